@@ -1,0 +1,69 @@
+# What every target is built with: the language level, warnings as errors, hidden symbols, sanitizers, output folders.
+
+set(CMAKE_CXX_STANDARD 20)
+set(CMAKE_CXX_STANDARD_REQUIRED ON)
+set(CMAKE_CXX_EXTENSIONS OFF)
+set(CMAKE_C_STANDARD 11)
+set(CMAKE_POSITION_INDEPENDENT_CODE ON)
+set(CMAKE_EXPORT_COMPILE_COMMANDS ON)
+set(CMAKE_CXX_VISIBILITY_PRESET hidden)
+set(CMAKE_C_VISIBILITY_PRESET hidden)
+set(CMAKE_VISIBILITY_INLINES_HIDDEN ON)
+set(CMAKE_LIBRARY_OUTPUT_DIRECTORY ${CMAKE_BINARY_DIR}/lib)
+set(CMAKE_RUNTIME_OUTPUT_DIRECTORY ${CMAKE_BINARY_DIR}/bin)
+set(CMAKE_BUILD_RPATH_USE_ORIGIN ON)
+
+find_program(ZORVA_CCACHE ccache)
+if(ZORVA_CCACHE)
+  set(CMAKE_CXX_COMPILER_LAUNCHER ${ZORVA_CCACHE})
+  set(CMAKE_C_COMPILER_LAUNCHER ${ZORVA_CCACHE})
+endif()
+
+# Which of CMPI's platform symbols holds here; the headers refuse to compile without one.
+add_compile_definitions(CMPI_PLATFORM_LINUX_GENERIC_GNU)
+
+add_compile_options(
+  -Wall -Wextra -Wpedantic -Wconversion -Wshadow -Werror
+  -ffile-prefix-map=${CMAKE_SOURCE_DIR}/=)
+add_link_options(-Wl,--as-needed)
+
+if(ZORVA_SANITIZE STREQUAL "address")
+  add_compile_options(-fsanitize=address,undefined -fno-sanitize-recover=all -fno-omit-frame-pointer)
+  add_link_options(-fsanitize=address,undefined)
+elseif(ZORVA_SANITIZE STREQUAL "thread")
+  add_compile_options(-fsanitize=thread -fno-omit-frame-pointer)
+  add_link_options(-fsanitize=thread)
+elseif(NOT ZORVA_SANITIZE STREQUAL "")
+  message(FATAL_ERROR "ZORVA_SANITIZE is '${ZORVA_SANITIZE}'; it takes address, thread or nothing")
+endif()
+
+if(ZORVA_COVERAGE)
+  add_compile_options(--coverage -fprofile-abs-path)
+  add_link_options(--coverage)
+endif()
+
+# zorva_limit_exports(TARGET FILE): only the symbols that FILE lists as global leave the shared library TARGET. A symbol
+# that stays inside cannot be bound from elsewhere, so the library can be unloaded and two of them do not mix.
+function(zorva_limit_exports target file)
+  target_link_options(${target} PRIVATE -Wl,--version-script=${CMAKE_CURRENT_SOURCE_DIR}/${file})
+  set_property(TARGET ${target} APPEND PROPERTY LINK_DEPENDS ${CMAKE_CURRENT_SOURCE_DIR}/${file})
+  target_compile_options(${target} PRIVATE $<$<CXX_COMPILER_ID:GNU>:-fno-gnu-unique>)
+endfunction()
+
+# zorva_add_test(NAME SOURCES files... LIBS libraries...): one GoogleTest program; each of its tests is a ctest test.
+function(zorva_add_test name)
+  if(NOT ZORVA_BUILD_TESTS)
+    return()
+  endif()
+  cmake_parse_arguments(ARG "" "" "SOURCES;LIBS;DEPENDS" ${ARGN})
+  add_executable(${name} ${ARG_SOURCES})
+  target_link_libraries(${name} PRIVATE ${ARG_LIBS} GTest::gmock GTest::gtest_main)
+  target_compile_definitions(${name} PRIVATE
+    ZORVA_LIB_DIR="${CMAKE_LIBRARY_OUTPUT_DIRECTORY}"
+    ZORVA_BIN_DIR="${CMAKE_RUNTIME_OUTPUT_DIRECTORY}"
+    ZORVA_SOURCE_DIR="${CMAKE_SOURCE_DIR}")
+  if(ARG_DEPENDS)
+    add_dependencies(${name} ${ARG_DEPENDS})
+  endif()
+  gtest_discover_tests(${name} DISCOVERY_MODE PRE_TEST PROPERTIES TIMEOUT 300)
+endfunction()
