@@ -23,8 +23,8 @@ enum LogLevel : int {
 // A line is cut where its buffer ends.
 constexpr std::size_t kMessageBufferSize = 512;
 
-// The four formatters. Each returns its own buffer, so that two of them never share one; the buffers are one set for each
-// thread, and a line stays valid until the same formatter runs again on its thread. Null text prints as "(null)".
+// The four formatters. Each returns its own buffer, so that two of them never share one; the buffers are one set for
+// each thread, and a line stays valid until the same formatter runs again on its thread. Null text prints as "(null)".
 
 inline const char* trace(const char* text, const char* file, unsigned int line, MessageType type) {
   static thread_local char messageBuffer[kMessageBufferSize];
@@ -46,14 +46,14 @@ inline const char* tracepara(const char* text, const char* file, unsigned int li
   static thread_local char messageBuffer[kMessageBufferSize];
   std::memset(messageBuffer, 0, sizeof messageBuffer);
   if (type == MSG_METHOD) {
-    std::snprintf(messageBuffer, sizeof messageBuffer,
-                  "METHOD: %s() was invoked in %s [Line: %d],Parameters List: %s", text, file, line, parameters);
+    std::snprintf(messageBuffer, sizeof messageBuffer, "METHOD: %s() was invoked in %s [Line: %d],Parameters List: %s",
+                  text, file, line, parameters);
   } else if (type == MSG_MESSAGE) {
     std::snprintf(messageBuffer, sizeof messageBuffer, "MESSAGE [File: %s, Line: %d]: %s,Parameters List: %s", file,
                   line, text, parameters);
   } else if (type == MSG_EXITING) {
-    std::snprintf(messageBuffer, sizeof messageBuffer, "EXITING: %s() in %s [Line: %d],Parameters List: %s", text,
-                  file, line, parameters);
+    std::snprintf(messageBuffer, sizeof messageBuffer, "EXITING: %s() in %s [Line: %d],Parameters List: %s", text, file,
+                  line, parameters);
   } else {
     std::snprintf(messageBuffer, sizeof messageBuffer, "ENTERING: %s() in %s [Line: %d],Parameters List: %s", text,
                   file, line, parameters);
@@ -83,7 +83,9 @@ struct LogSite {
   const char* file;
   unsigned int line;
 };
-#define ZV_HERE (::ZV::LogSite{static_cast<const char*>(__func__), __FILE__, __LINE__})
+#define ZV_HERE ZV_HERE_IN(static_cast<const char*>(__func__))
+// For a lambda, whose own name would stand in the place of the function's.
+#define ZV_HERE_IN(function) (::ZV::LogSite{function, __FILE__, __LINE__})
 
 // A log pair: the same line to the log and then to the trace. format is called afresh for each half.
 template <typename Format>
@@ -95,8 +97,8 @@ void logPair(const std::string& logger, const LogSite& site, int level, Format f
   }
   {
     ZALog::ZAMessageBuffer buffer;
-    ZALog::ZALogger::traceLevelMessage(site.function, site.file, static_cast<int>(site.line), logger, level, nullptr,
-                                       0, 0, buffer.str(buffer << format()));
+    ZALog::ZALogger::traceLevelMessage(site.function, site.file, static_cast<int>(site.line), logger, level, nullptr, 0,
+                                       0, buffer.str(buffer << format()));
   }
 }
 
@@ -129,7 +131,8 @@ void appendParameter(ZALog::ZAMessageBuffer& buffer, const T& labelOrValue) {
   }
 }
 
-// A line with a parameter list of labels and values in turn: logEntry(logger, ZV_HERE, " broker=", broker, " ref=", ref).
+// A line with a parameter list of labels and values in turn: logEntry(logger, ZV_HERE, " broker=", broker, " ref=",
+// ref).
 template <typename... LabelsAndValues>
 void logWithParameters(const std::string& logger, const LogSite& site, MessageType type,
                        const LabelsAndValues&... labelsAndValues) {
@@ -150,8 +153,7 @@ void logExit(const std::string& logger, const LogSite& site, const LabelsAndValu
   logWithParameters(logger, site, MSG_EXITING, labelsAndValues...);
 }
 
-inline constexpr const char* kBanner =
-    "==============================================================================";
+inline constexpr const char* kBanner = "==============================================================================";
 static_assert(std::char_traits<char>::length(kBanner) == 78);
 
 // Frame a provider operation in the log. The lines tell of the operation, the logger's own arguments of this header.
@@ -165,7 +167,8 @@ inline void markProviderExit(const std::string& logger, const char* function, co
   logPair(logger, ZV_HERE, LOG_LEVEL_DETAIL, [] { return kBanner; });
 }
 
-#define ZV_PROVIDER_ENTRY(logger) ::ZV::markProviderEntry(logger, static_cast<const char*>(__func__), __FILE__, __LINE__)
+#define ZV_PROVIDER_ENTRY(logger) \
+  ::ZV::markProviderEntry(logger, static_cast<const char*>(__func__), __FILE__, __LINE__)
 #define ZV_PROVIDER_EXIT(logger) ::ZV::markProviderExit(logger, static_cast<const char*>(__func__), __FILE__, __LINE__)
 
 }  // namespace ZV

@@ -1,0 +1,88 @@
+// The state of the agent in this process: configuration, source, latest snapshot.
+#pragma once
+
+#include <sys/types.h>
+
+#include <atomic>
+#include <deque>
+#include <memory>
+#include <mutex>
+#include <optional>
+#include <string>
+
+#include "agent/config/Config.h"
+#include "agent/tree/Overlay.h"
+#include "agent/tree/TreeSnapshot.h"
+#include "agent/tree/TreeSource.h"
+
+namespace zorvagent {
+
+// One for the process, made when it is first asked for, ended when the library is unloaded. Thread-safe. A fork waits
+// until nobody is inside, so that the child finds it whole.
+class Runtime {
+ public:
+  static Runtime& instance();
+
+  // The configuration, read when it is first asked for; the built-in defaults where it is wrong. What this returns
+  // stays valid until the library is unloaded.
+  const Config& config();
+
+  // Throws the ConfigError of a configuration that is wrong.
+  void checkConfig();
+
+  // Takes this configuration, and lets go of the source and the snapshot that came from another.
+  void useConfig(const Config& config);
+
+  // The tree as it is now: looks for changes and reads again where there are any. Throws what the source throws, after
+  // it has been logged, or a ConfigError.
+  std::shared_ptr<const TreeSnapshot> look();
+
+  // The tree as it was at the last look; looks where there was none.
+  std::shared_ptr<const TreeSnapshot> latest();
+
+  // The system's name. Never throws but std::bad_alloc.
+  std::string systemName();
+
+  // Stores a value of the node at that path in the overlay. False, with the reason in the log, where that fails.
+  bool store(const std::string& path, PropertyNumber property, const PropertyValue& value);
+
+  // The overlay of the configured data directory. Throws ConfigError. Who changes it tells of that.
+  Overlay overlay();
+  void overlayHasChanged();
+
+  void setSource(std::shared_ptr<TreeSource> source);
+  void reset();
+
+ private:
+  struct LoadedConfig {
+    Config config;
+    std::optional<ConfigError> error;
+  };
+
+  Runtime();
+
+  const LoadedConfig& loadedConfig();
+  std::shared_ptr<const TreeSnapshot> lookAndRead();
+  void followFork();
+  void forgetTree();
+  void holdStill();
+  void goOn();
+
+  std::mutex configMutex_;
+  std::deque<LoadedConfig> configs_;  // the last one holds; earlier ones stay for those who point at them
+  std::atomic<const LoadedConfig*> loadedConfig_ = nullptr;
+
+  std::mutex lookMutex_;  // over everything from here to latestMutex_
+  pid_t process_;         // whose sockets and watches these are
+  std::shared_ptr<TreeSource> source_;
+  bool sourceIsGiven_ = false;  // it does not come from the configuration
+  std::optional<OverlayReader> overlay_;
+  std::shared_ptr<const TreeSnapshot> sourceTree_;  // null: to be read again
+  bool overlayStale_ = true;
+  bool latestStale_ = true;
+
+  std::mutex latestMutex_;  // taken within lookMutex_, never the other way round
+  std::shared_ptr<const TreeSnapshot> latest_;
+};
+
+}  // namespace zorvagent

@@ -1,0 +1,60 @@
+// The agent's configuration.
+#pragma once
+
+#include <stdexcept>
+#include <string>
+
+#include "agent/interface/AgentApi.h"
+
+namespace zorvagent {
+
+// A file that was written by a person and is wrong: the configuration, or the JSON document of a tree. what() is one
+// line, "FILE:LINE: KEY: what is wrong", without the parts that are not known.
+class ZORVA_AGENT_API ConfigError : public std::runtime_error {
+ public:
+  // line counts from 1, 0 is unknown; key and file may be empty. Control characters in them come out escaped in what().
+  ConfigError(const std::string& file, int line, const std::string& key, const std::string& problem);
+  ~ConfigError() override;
+
+  const std::string& file() const { return file_; }
+  int line() const { return line_; }
+  const std::string& key() const { return key_; }
+  const std::string& problem() const { return problem_; }
+
+ private:
+  std::string file_;
+  int line_;
+  std::string key_;
+  std::string problem_;
+};
+
+// Paths that are not absolute are taken from the directory of the configuration's file.
+struct Config {
+  std::string file;  // what it was read from; empty for the built-in defaults
+
+  // [agent]
+  std::string dataDir = "/var/lib/zorvagent/";  // ends in a slash
+  std::string systemName;                       // empty: the name that the tree's source tells
+  std::string language = "en";
+
+  // [tree]
+  std::string source = "host";  // or "file"
+  std::string treeFile;         // the JSON document of source "file"
+  bool includeLoopback = false;
+
+  // [log]
+  int logLevel = 6000;  // lines below it are dropped
+  std::string logTarget = "stderr";
+  int traceLevel = 6000;
+  std::string traceTarget = "off";
+};
+
+// Reads and checks a configuration (TOML 1.0). Throws ConfigError for whatever is wrong with it, a file that cannot be
+// read included. Thread-safe.
+ZORVA_AGENT_API Config readConfig(const std::string& path);
+
+// The configuration of this process as its environment asks for it: the file that ZORVAGENT_CONFIG names, else
+// /etc/zorvagent/agent.toml, else, where that is not there, the built-in defaults. Throws as readConfig does.
+ZORVA_AGENT_API Config readDefaultConfig();
+
+}  // namespace zorvagent

@@ -1,0 +1,156 @@
+#include "agent/config/Config.h"
+
+#include <gtest/gtest.h>
+#include <stdlib.h>
+
+#include "agent/testing/TemporaryDirectory.h"
+
+namespace zorvagent {
+namespace {
+
+using testing::TemporaryDirectory;
+
+class ConfigTest : public ::testing::Test {
+ protected:
+  Config read(const std::string& text) { return readConfig(directory_.write("agent.toml", text)); }
+
+  // What is wrong with a configuration, without the directory.
+  std::string wrong(const std::string& text) {
+    try {
+      read(text);
+    } catch (const ConfigError& error) {
+      const std::string line = error.what();
+      EXPECT_EQ(line.find('\n'), std::string::npos) << "an error is one line";
+      EXPECT_TRUE(line.starts_with(directory_.path())) << line;
+      return line.substr(directory_.path().size());
+    }
+    return "nothing";
+  }
+
+  TemporaryDirectory directory_;
+};
+
+TEST_F(ConfigTest, EveryKeyIsOptional) {
+  const Config config = read("");
+  EXPECT_EQ(config.dataDir, "/var/lib/zorvagent/");
+  EXPECT_EQ(config.systemName, "");
+  EXPECT_EQ(config.language, "en");
+  EXPECT_EQ(config.source, "host");
+  EXPECT_EQ(config.treeFile, "");
+  EXPECT_FALSE(config.includeLoopback);
+  EXPECT_EQ(config.logLevel, 6000);
+  EXPECT_EQ(config.logTarget, "stderr");
+  EXPECT_EQ(config.traceLevel, 6000);
+  EXPECT_EQ(config.traceTarget, "off");
+}
+
+TEST_F(ConfigTest, EveryKeyIsRead) {
+  const Config config = read(R"(
+[agent]
+data_dir = "/srv/agent"   # a slash is added
+system_name = "node7"
+language = "de"
+[tree]
+source = "file"
+file = "/srv/tree.json"
+include_loopback = true
+apply = "overlay"
+[log]
+level = 3000
+target = "syslog"
+trace_level = -4
+trace_target = "/var/log/agent.trace"
+)");
+  EXPECT_EQ(config.dataDir, "/srv/agent/");
+  EXPECT_EQ(config.systemName, "node7");
+  EXPECT_EQ(config.language, "de");
+  EXPECT_EQ(config.source, "file");
+  EXPECT_EQ(config.treeFile, "/srv/tree.json");
+  EXPECT_TRUE(config.includeLoopback);
+  EXPECT_EQ(config.logLevel, 3000);
+  EXPECT_EQ(config.logTarget, "syslog");
+  EXPECT_EQ(config.traceLevel, -4);
+  EXPECT_EQ(config.traceTarget, "/var/log/agent.trace");
+}
+
+TEST_F(ConfigTest, PathsAreTakenFromTheDirectoryOfTheFile) {
+  const Config config = read("agent.data_dir = \"data/\"\ntree.file = \"tree.json\"\nlog.target = \"log\"\n");
+  EXPECT_EQ(config.dataDir, directory_ / "data/");
+  EXPECT_EQ(config.treeFile, directory_ / "tree.json");
+  EXPECT_EQ(config.logTarget, directory_ / "log");
+}
+
+TEST_F(ConfigTest, AnUnknownTableOrKeyIsNamedWithItsLine) {
+  EXPECT_EQ(wrong("[agent]\n\ndata_dri = 1\n"), "agent.toml:3: agent.data_dri: is not a known key");
+  EXPECT_EQ(wrong("[agnet]\n"), "agent.toml:1: agnet: is not a known table or key");
+  EXPECT_EQ(wrong("level = 1\n"), "agent.toml:1: level: is not a known table or key");
+  EXPECT_EQ(wrong("[log]\n\"a\\nb\" = 1\n"), "agent.toml:2: log.a\\nb: is not a known key");
+}
+
+TEST_F(ConfigTest, AWrongTypeIsNamedWithItsLine) {
+  EXPECT_EQ(wrong("[agent]\ndata_dir = 7\n"), "agent.toml:2: agent.data_dir: expected a text in quotes");
+  EXPECT_EQ(wrong("[log]\nlevel = \"6000\"\n"), "agent.toml:2: log.level: expected a whole number");
+  EXPECT_EQ(wrong("[log]\nlevel = 1.5\n"), "agent.toml:2: log.level: expected a whole number");
+  EXPECT_EQ(wrong("[log]\ntrace_level = 99999999999\n"), "agent.toml:2: log.trace_level: is out of range");
+  EXPECT_EQ(wrong("[tree]\ninclude_loopback = 1\n"), "agent.toml:2: tree.include_loopback: expected true or false");
+  EXPECT_EQ(wrong("agent = 1\n"), "agent.toml:1: agent: expected a table");
+}
+
+TEST_F(ConfigTest, AWrongValueIsNamedWithItsLine) {
+  EXPECT_EQ(wrong("[tree]\nsource = \"hots\"\n"), "agent.toml:2: tree.source: expected \"host\" or \"file\"");
+  EXPECT_EQ(wrong("[tree]\nsource = \"file\"\n"),
+            "agent.toml: tree.file: is needed where tree.source is \"file\"");
+  EXPECT_EQ(wrong("[tree]\napply = \"both\"\n"), "agent.toml:2: tree.apply: expected \"overlay\" or \"host\"");
+  EXPECT_EQ(wrong("[agent]\ndata_dir = \"\"\n"), "agent.toml:2: agent.data_dir: must not be empty");
+  EXPECT_EQ(wrong("[agent]\ndata_dir = \"a\\u0000b\"\n"), "agent.toml:2: agent.data_dir: must not hold a NUL");
+  EXPECT_EQ(wrong("[agent]\nsystem_name = \"a\\nb\"\n"),
+            "agent.toml:2: agent.system_name: must not hold control characters");
+  EXPECT_EQ(wrong("[agent]\nlanguage = \"\"\n"), "agent.toml:2: agent.language: expected a language such as \"en\"");
+  EXPECT_EQ(wrong("[log]\ntarget = \"\"\n"),
+            "agent.toml:2: log.target: expected \"stderr\", \"syslog\", \"off\" or a path");
+}
+
+TEST_F(ConfigTest, ApplyingToTheHostIsRefusedWhileItIsNotOffered) {
+  EXPECT_EQ(wrong("[tree]\napply = \"host\"\n"),
+            "agent.toml:2: tree.apply: \"host\" is not offered by this version; use \"overlay\"");
+}
+
+TEST_F(ConfigTest, WhatIsNoTomlIsNamedWithItsLine) {
+  EXPECT_TRUE(wrong("[agent]\ndata_dir = \n").starts_with("agent.toml:2: ")) << wrong("[agent]\ndata_dir = \n");
+  EXPECT_TRUE(wrong("[agent]\n[agent]\n").starts_with("agent.toml:2: "));
+  EXPECT_TRUE(wrong("a = \"\xFF\"\n").starts_with("agent.toml:1: "));
+  EXPECT_TRUE(wrong(std::string("\0\0\0", 3)).starts_with("agent.toml:1: "));
+}
+
+TEST_F(ConfigTest, DeepNestingIsRefused) {
+  const std::string deep = "a = " + std::string(100000, '[') + std::string(100000, ']') + "\n";
+  EXPECT_TRUE(wrong(deep).starts_with("agent.toml:1: ")) << wrong(deep);
+}
+
+TEST_F(ConfigTest, AFileThatIsTooLargeIsRefused) {
+  EXPECT_EQ(wrong(std::string(300000, '\n')), "agent.toml: is larger than 256 KiB");
+}
+
+TEST_F(ConfigTest, AFileThatCannotBeReadIsNamed) {
+  EXPECT_THROW(readConfig(directory_ / "absent.toml"), ConfigError);
+  try {
+    readConfig("/dev/zero");
+    FAIL() << "a device is no configuration";
+  } catch (const ConfigError& error) {
+    EXPECT_STREQ(error.what(), "/dev/zero: cannot be read: not a regular file");
+    EXPECT_EQ(error.file(), "/dev/zero");
+    EXPECT_EQ(error.line(), 0);
+    EXPECT_EQ(error.key(), "");
+  }
+}
+
+TEST_F(ConfigTest, TheEnvironmentNamesTheFile) {
+  ::setenv("ZORVAGENT_CONFIG", directory_.write("mine.toml", "agent.system_name = \"mine\"\n").c_str(), 1);
+  EXPECT_EQ(readDefaultConfig().systemName, "mine");
+  ::setenv("ZORVAGENT_CONFIG", (directory_ / "absent.toml").c_str(), 1);
+  EXPECT_THROW(readDefaultConfig(), ConfigError) << "a file that is named must be there";
+  ::unsetenv("ZORVAGENT_CONFIG");
+}
+
+}  // namespace
+}  // namespace zorvagent

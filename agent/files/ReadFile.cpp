@@ -1,0 +1,53 @@
+#include "agent/files/ReadFile.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <cstring>
+#include <system_error>
+
+#include "agent/files/FileDescriptor.h"
+
+namespace zorvagent {
+namespace {
+
+constexpr std::size_t kFirstRoom = 4096;
+
+}  // namespace
+
+FileText readFile(const std::string& path, std::size_t limit) {
+  FileText result;
+  // A path with a NUL in it would be opened up to there, as another file.
+  if (path.find('\0') != std::string::npos) return {{}, false, ENOENT};
+  const FileDescriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
+  struct stat status {};
+  if (!file || ::fstat(file.get(), &status) != 0) return {{}, false, errno};
+  if (!S_ISREG(status.st_mode)) return {{}, false, EINVAL};
+
+  // The size that fstat tells is a guess only: the files of /proc and /sys tell none.
+  const auto told = static_cast<std::size_t>(std::max<off_t>(status.st_size, 0));
+  std::size_t used = 0;
+  std::size_t room = std::min(limit, std::max(told, kFirstRoom)) + 1;
+  for (;;) {
+    result.text.resize(room);
+    const ssize_t got = ::read(file.get(), result.text.data() + used, room - used);
+    if (got < 0 && errno == EINTR) continue;
+    if (got < 0) return {{}, false, errno};
+    used += static_cast<std::size_t>(got);
+    if (got == 0 || used > limit) break;
+    if (used == room) room = std::min(limit + 1, room * 2);
+  }
+  result.truncated = used > limit;
+  result.text.resize(std::min(used, limit));
+  return result;
+}
+
+std::string fileErrorText(int error) {
+  if (error == EINVAL) return "not a regular file";
+  return std::generic_category().message(error);
+}
+
+}  // namespace zorvagent

@@ -1,0 +1,22 @@
+// Reads a small regular file whole.
+#pragma once
+
+#include <cstddef>
+#include <string>
+
+namespace zorvagent {
+
+struct FileText {
+  std::string text;        // what was read, at most the limit
+  bool truncated = false;  // there was more
+  int error = 0;           // errno of what failed, 0 where nothing did; EINVAL for what is not a regular file
+};
+
+// Reads a file up to limit bytes. What is not a regular file (symbolic links are followed) is not read, and neither
+// blocks nor is waited for. Throws std::bad_alloc alone.
+FileText readFile(const std::string& path, std::size_t limit);
+
+// What an error number of FileText means, in words.
+std::string fileErrorText(int error);
+
+}  // namespace zorvagent

@@ -1,0 +1,263 @@
+#include "agent/log/LogOutput.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <array>
+#include <cerrno>
+#include <limits>
+#include <memory>
+#include <mutex>
+#include <stdexcept>
+
+#include "agent/Runtime.h"
+#include "agent/files/FileDescriptor.h"
+#include "agent/files/ReadFile.h"
+#include "agent/log/Escape.h"
+
+#define FMT_HEADER_ONLY
+#define SPDLOG_NO_THREAD_ID
+#include <spdlog/logger.h>
+#include <spdlog/pattern_formatter.h>
+#include <spdlog/sinks/base_sink.h>
+#include <spdlog/sinks/syslog_sink.h>
+
+namespace zorvagent {
+
+constinit std::atomic<int> logThreshold{std::numeric_limits<int>::min()};
+constinit std::atomic<int> traceThreshold{std::numeric_limits<int>::min()};
+
+namespace {
+
+constexpr int kEverything = std::numeric_limits<int>::min();
+constexpr int kNothing = std::numeric_limits<int>::max();
+
+std::atomic<int>& thresholdOf(LogStream stream) { return stream == LogStream::Log ? logThreshold : traceThreshold; }
+
+// Writes each line with one call, so that lines of several processes in one file stay whole.
+class DescriptorSink : public spdlog::sinks::base_sink<spdlog::details::null_mutex> {
+ public:
+  explicit DescriptorSink(int borrowed) : descriptor_(borrowed) {}
+  explicit DescriptorSink(FileDescriptor owned) : owned_(std::move(owned)), descriptor_(owned_.get()) {}
+
+ protected:
+  void sink_it_(const spdlog::details::log_msg& message) override {
+    spdlog::memory_buf_t line;
+    formatter_->format(message, line);
+    const char* rest = line.data();
+    for (std::size_t left = line.size(); left > 0;) {
+      const ssize_t written = ::write(descriptor_, rest, left);
+      if (written < 0 && errno == EINTR) continue;
+      if (written <= 0) return;
+      rest += written;
+      left -= static_cast<std::size_t>(written);
+    }
+  }
+  void flush_() override {}
+
+ private:
+  FileDescriptor owned_;
+  int descriptor_;
+};
+
+// Opens a file for appending. A FIFO or a socket would block or end the process some day.
+FileDescriptor openLogFile(const std::string& path) {
+  constexpr mode_t kMode = 0640;
+  FileDescriptor file(::open(path.c_str(), O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC | O_NOCTTY | O_NONBLOCK, kMode));
+  struct stat status {};
+  const int error = !file || ::fstat(file.get(), &status) != 0           ? errno
+                    : S_ISREG(status.st_mode) || S_ISCHR(status.st_mode) ? 0
+                                                                         : EINVAL;
+  if (error != 0) throw std::runtime_error(path + ": cannot be opened as a log: " + fileErrorText(error));
+  return file;
+}
+
+using Logger = std::unique_ptr<spdlog::logger>;
+
+// Null for "off".
+Logger makeLogger(const std::string& target) {
+  if (target == "off") return nullptr;
+  spdlog::sink_ptr sink;
+  if (target == "stderr") {
+    sink = std::make_shared<DescriptorSink>(STDERR_FILENO);
+  } else if (target == "syslog") {
+    sink = std::make_shared<spdlog::sinks::syslog_sink_st>(std::string(), 0, LOG_DAEMON, false);
+  } else {
+    sink = std::make_shared<DescriptorSink>(openLogFile(target));
+  }
+  auto logger = std::make_unique<spdlog::logger>("zorvagent", std::move(sink));
+  logger->set_pattern("%Y-%m-%dT%H:%M:%S.%e%z %v");
+  logger->set_level(spdlog::level::trace);
+  logger->set_error_handler([](const std::string&) {});  // a line that cannot be written is lost
+  return logger;
+}
+
+// What syslog is to make of a level.
+spdlog::level::level_enum severity(int level) {
+  constexpr int kDetail = 4000;
+  if (level >= kLevelError) return spdlog::level::err;
+  return level >= kDetail ? spdlog::level::info : spdlog::level::debug;
+}
+
+void appendText(std::string& line, const char* text) {
+  if (text != nullptr) appendEscaped(line, text);
+}
+
+std::string composeLine(const LogCall& call) {
+  std::string line = std::to_string(call.level);
+  line += ' ';
+  appendEscaped(line, call.category);
+  line += ' ';
+  appendText(line, call.function);
+  line += ' ';
+  appendText(line, call.file);
+  line += ':';
+  line += std::to_string(call.line);
+  line += ' ';
+  appendEscaped(line, call.message);
+  return line;
+}
+
+struct Stream {
+  int level = kNothing;
+  Logger logger;
+};
+
+class Output {
+ public:
+  ~Output() {
+    // A line that comes while the process ends is dropped.
+    logThreshold = kNothing;
+    traceThreshold = kNothing;
+  }
+
+  void write(const LogCall& call) {
+    if (sink_ != nullptr) return sink_->record(call);
+    writeToTarget(call);
+  }
+
+  void writeOwn(const LogCall& call) {
+    if (sink_ != nullptr) return sink_->recordOwn(call.level, call.message);
+    writeToTarget(call);
+  }
+
+  void setSink(LogSink* sink) {
+    sink_ = sink;
+    publishThresholds();
+  }
+
+  void setLevel(LogStream stream, int level) {
+    configure();
+    streamOf(stream).level = level;
+    publishThresholds();
+  }
+
+  void setTarget(LogStream stream, const std::string& target) {
+    configure();
+    streamOf(stream).logger = makeLogger(target);
+    publishThresholds();
+  }
+
+  void reset() {
+    sink_ = nullptr;
+    configured_ = false;
+    streams_ = {};
+    publishThresholds();
+  }
+
+ private:
+  Stream& streamOf(LogStream stream) { return streams_[stream == LogStream::Log ? 0 : 1]; }
+
+  void writeToTarget(const LogCall& call) {
+    configure();
+    const Stream& stream = streamOf(call.stream);
+    if (stream.logger != nullptr && call.level >= stream.level) {
+      stream.logger->log(severity(call.level), composeLine(call));
+    }
+  }
+
+  void configure() {
+    if (configured_) return;
+    configured_ = true;
+    const Config& config = Runtime::instance().config();
+    streams_[0] = open(config.logLevel, config.logTarget);
+    streams_[1] = open(config.traceLevel, config.traceTarget);
+    publishThresholds();
+  }
+
+  static Stream open(int level, const std::string& target) {
+    try {
+      return {level, makeLogger(target)};
+    } catch (const std::runtime_error& error) {
+      const std::string line = std::string("zorvagent: ") + error.what() + "; its lines are lost\n";
+      [[maybe_unused]] const ssize_t written = ::write(STDERR_FILENO, line.data(), line.size());
+      return {};
+    }
+  }
+
+  // A sink takes every line, and before the configuration is read nobody knows which to drop.
+  void publishThresholds() {
+    for (const LogStream stream : {LogStream::Log, LogStream::Trace}) {
+      const Stream& settings = streamOf(stream);
+      const int level = settings.logger == nullptr ? kNothing : settings.level;
+      thresholdOf(stream) = sink_ != nullptr || !configured_ ? kEverything : level;
+    }
+  }
+
+  LogSink* sink_ = nullptr;
+  bool configured_ = false;
+  std::array<Stream, 2> streams_;
+};
+
+constinit std::mutex outputMutex;
+
+Output& output() {
+  static Output instance;
+  return instance;
+}
+
+}  // namespace
+
+void writeLine(const LogCall& call) noexcept try {
+  const std::lock_guard lock(outputMutex);
+  output().write(call);
+} catch (...) {
+  // Lost, as a line that cannot be written.
+}
+
+void logOwn(int level, const char* function, const char* file, int line, const std::string& message) noexcept try {
+  const std::string category = "Zorvagent.Agent";
+  const LogCall call{LogStream::Log, function, file, line, category, level, nullptr, 0, 0, message};
+  if (isDropped(call.stream, level)) return;
+  const std::lock_guard lock(outputMutex);
+  output().writeOwn(call);
+} catch (...) {
+  // Lost, as a line that cannot be written.
+}
+
+void setStreamLevel(LogStream stream, int level) {
+  const std::lock_guard lock(outputMutex);
+  output().setLevel(stream, level);
+}
+
+void setStreamTarget(LogStream stream, const std::string& target) {
+  const std::lock_guard lock(outputMutex);
+  output().setTarget(stream, target);
+}
+
+void setLogSink(LogSink* sink) {
+  const std::lock_guard lock(outputMutex);
+  output().setSink(sink);
+}
+
+void resetLog() {
+  const std::lock_guard lock(outputMutex);
+  output().reset();
+}
+
+void lockLog() { outputMutex.lock(); }
+
+void unlockLog() { outputMutex.unlock(); }
+
+}  // namespace zorvagent

@@ -1,0 +1,44 @@
+// Where lines go.
+#pragma once
+
+#include <atomic>
+#include <string>
+
+#include "agent/log/LogSink.h"
+
+namespace zorvagent {
+
+// The level below which a stream drops lines. Starts so low that the first line goes on to the place where the
+// configuration is asked.
+extern std::atomic<int> logThreshold;
+extern std::atomic<int> traceThreshold;
+
+inline bool isDropped(LogStream stream, int level) {
+  const auto& threshold = stream == LogStream::Log ? logThreshold : traceThreshold;
+  return level < threshold.load(std::memory_order_relaxed);
+}
+
+// Writes a line to the stream's target. Never throws.
+void writeLine(const LogCall& call) noexcept;
+
+// Writes a line of the agent's own to the log, under the category "Zorvagent.Agent". Never throws.
+void logOwn(int level, const char* function, const char* file, int line, const std::string& message) noexcept;
+
+inline constexpr int kLevelError = 6000;
+
+#define ZORVAGENT_LOG_ERROR(message) \
+  ::zorvagent::logOwn(::zorvagent::kLevelError, static_cast<const char*>(__func__), __FILE__, __LINE__, (message))
+
+// Change a stream at run time. The target is "stderr", "syslog", "off" or the path of a file that is appended to;
+// std::runtime_error, with the reason, where that cannot be opened, and the target stays.
+void setStreamLevel(LogStream stream, int level);
+void setStreamTarget(LogStream stream, const std::string& target);
+
+// Forgets the sink and all settings; the next line asks the configuration again.
+void resetLog();
+
+// Hold the log still over a fork.
+void lockLog();
+void unlockLog();
+
+}  // namespace zorvagent

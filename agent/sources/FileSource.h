@@ -1,0 +1,27 @@
+// A tree from a JSON document, for demonstrations and tests.
+#pragma once
+
+#include <string>
+
+#include "agent/files/FileWatch.h"
+#include "agent/tree/TreeSource.h"
+
+namespace zorvagent {
+
+class FileSource : public TreeSource {
+ public:
+  explicit FileSource(std::string path);
+
+  bool changed() override;
+
+  // Throws ConfigError where the document is wrong or cannot be read.
+  std::shared_ptr<const TreeSnapshot> read() override;
+
+  void reopen() override;
+
+ private:
+  std::string path_;
+  FileWatch watch_;
+};
+
+}  // namespace zorvagent

@@ -1,0 +1,164 @@
+#include "agent/sources/HostSource.h"
+
+#include <linux/if.h>
+#include <sys/utsname.h>
+
+#include <algorithm>
+#include <unordered_map>
+#include <unordered_set>
+#include <utility>
+
+#include "agent/files/ReadFile.h"
+
+namespace zorvagent {
+namespace {
+
+using namespace ZV::NodeLexicon;
+
+constexpr std::size_t kLargestFile = std::size_t{64} << 10;
+constexpr const char* kComputer = "Computer";
+
+// Raw enabled states, as PROP_ENABLED_STATE has them.
+constexpr unsigned int kUpWithCarrier = 1;
+constexpr unsigned int kUpWithoutCarrier = 12;
+constexpr unsigned int kDown = 16;
+
+// CIM's ProtocolIFType.
+constexpr unsigned int kOther = 1;
+constexpr unsigned int kIPv4 = 4096;
+constexpr unsigned int kIPv6 = 4097;
+constexpr unsigned int kBoth = 4098;
+
+std::string kernelNodeName() {
+  utsname name{};
+  return ::uname(&name) == 0 ? name.nodename : "";
+}
+
+unsigned int enabledState(const Link& link) {
+  if ((link.flags & IFF_UP) == 0) return kDown;
+  // A driver that does not tell its operational state, a tunnel's say, still tells whether the lower layer is up.
+  const bool carrier =
+      link.operState == IF_OPER_UP || (link.operState == IF_OPER_UNKNOWN && (link.flags & IFF_LOWER_UP) != 0);
+  return carrier ? kUpWithCarrier : kUpWithoutCarrier;
+}
+
+unsigned int protocolType(const AddressList& addresses) {
+  const auto has = [&addresses](AddressFamily family) {
+    return std::any_of(addresses.begin(), addresses.end(),
+                       [family](const InterfaceAddress& address) { return address.family() == family; });
+  };
+  const bool ipv4 = has(AddressFamily::IPv4);
+  const bool ipv6 = has(AddressFamily::IPv6);
+  if (ipv4 && ipv6) return kBoth;
+  if (!ipv4 && !ipv6) return kOther;
+  return ipv4 ? kIPv4 : kIPv6;
+}
+
+// A file that cannot be read counts as one that says nothing; a line that the limit cuts is left out.
+std::string linesOf(const std::string& path) {
+  FileText file = readFile(path, kLargestFile);
+  if (file.truncated) file.text.erase(file.text.rfind('\n') + 1);
+  return std::move(file.text);
+}
+
+SharedStrings share(StringList list) { return std::make_shared<const StringList>(std::move(list)); }
+
+using AddressesOfLinks = std::unordered_map<int, AddressList>;
+
+AddressesOfLinks addressesByLink(LinkTable& table) {
+  AddressesOfLinks result;
+  for (LinkAddress& address : table.addresses) result[address.index].push_back(std::move(address.address));
+  return result;
+}
+
+}  // namespace
+
+HostSource::HostSource(HostSourceOptions options)
+    : options_(std::move(options)),
+      resolvConf_(options_.root + "/etc/resolv.conf"),
+      stubResolvConf_(options_.root + "/run/systemd/resolve/resolv.conf"),
+      hosts_(options_.root + "/etc/hosts") {}
+
+bool HostSource::changed() {
+  if (!watching_) return true;
+  const bool linksChanged = monitor_.changed();
+  if (watch_.changed()) filesMoved_ = true;
+  return linksChanged || filesMoved_ || kernelNodeName() != nodeName_;
+}
+
+void HostSource::reopen() {
+  watching_ = false;
+  reader_.close();
+}
+
+// Before anything is read, so that what changes meanwhile is reported afterwards.
+void HostSource::startWatching() {
+  if (!watching_) monitor_.open();
+  if (!watching_ || filesMoved_) watch_.watch({resolvConf_, stubResolvConf_, hosts_});
+  watching_ = true;
+  filesMoved_ = false;
+}
+
+std::shared_ptr<const TreeSnapshot> HostSource::read() {
+  startWatching();
+  nodeName_ = kernelNodeName();
+  const Resolver resolver = readResolver();
+  LinkTable table = reader_.read();
+  AddressesOfLinks addresses = addressesByLink(table);
+
+  TreeBuilder builder(nodeName_);
+  constexpr std::size_t kNodesOfLink = 2;
+  builder.reserve(kNodesOfLink * table.links.size() + kNodesOfLink);
+  const std::size_t system = builder.add(0, NodeType::System, "system", product());
+  std::unordered_set<std::string_view> seen;
+  for (const Link& link : table.links) {
+    if ((link.flags & IFF_LOOPBACK) != 0 && !options_.includeLoopback) continue;
+    // A dump that was interrupted may have one name twice; a report of the change is on its way.
+    if (!seen.insert(link.name).second) continue;
+    const auto own = std::make_shared<const AddressList>(std::move(addresses[link.index]));
+    const std::size_t port = builder.add(system, NodeType::Port, link.name);
+    const std::size_t node = builder.add(port, NodeType::NetworkIPConfig, "ip");
+    builder.set(node, PROP_NAME, link.name);
+    builder.set(node, PROP_HOST_NAME, resolver.names.host);
+    if (!resolver.names.domain.empty()) builder.set(node, PROP_DOMAIN_NAME, resolver.names.domain);
+    if (resolver.search != nullptr) builder.set(node, PROP_DNS_SUFFIXES, resolver.search);
+    if (resolver.servers != nullptr) builder.set(node, PROP_DNS_SERVER_ADDRESSES, resolver.servers);
+    builder.set(node, PROP_PROTOCOL_IF_TYPE, protocolType(*own));
+    builder.set(node, PROP_ENABLED_STATE, enabledState(link));
+    builder.set(node, kAddresses, own);
+  }
+  return builder.finish();
+}
+
+HostSource::Resolver HostSource::readResolver() const {
+  Resolver result;
+  FileText file = readFile(resolvConf_, kLargestFile);
+  ResolvConf conf;
+  if (file.error == 0) {
+    if (file.truncated) file.text.erase(file.text.rfind('\n') + 1);
+    conf = parseResolvConf(file.text);
+    StringList servers = conf.servers;
+    if (namesOnlyLocalStub(conf)) {
+      const ResolvConf behind = parseResolvConf(linesOf(stubResolvConf_));
+      if (!behind.servers.empty()) servers = behind.servers;
+    }
+    result.servers = share(std::move(servers));
+    result.search = share(conf.search);
+  }
+  const bool hasDomain = nodeName_.find('.') != std::string::npos;
+  result.names = findHostNames(nodeName_, hasDomain ? std::string() : linesOf(hosts_), conf);
+  return result;
+}
+
+// What the machine is called by its maker, where the firmware tells. It stays the same while the machine runs.
+const std::string& HostSource::product() {
+  if (!product_.empty()) return product_;
+  std::string name = linesOf(options_.root + "/sys/class/dmi/id/product_name");
+  const std::size_t end = name.find_last_not_of(" \t\r\n");
+  name.erase(end == std::string::npos ? 0 : end + 1);
+  // "BMC" is what tells a service processor, and this is none.
+  product_ = name.empty() || name == "BMC" ? kComputer : name;
+  return product_;
+}
+
+}  // namespace zorvagent

@@ -1,0 +1,61 @@
+// The tree of the host that the agent runs on.
+#pragma once
+
+#include <string>
+
+#include "agent/files/FileWatch.h"
+#include "agent/sources/HostNames.h"
+#include "agent/sources/Netlink.h"
+#include "agent/tree/TreeSource.h"
+
+namespace zorvagent {
+
+struct HostSourceOptions {
+  bool includeLoopback = false;
+  std::string root;  // put before the path of each file that is read; for tests
+};
+
+// Interfaces with state and addresses from the kernel; names from the kernel, /etc/hosts and resolv.conf; DNS servers
+// and search domains from /etc/resolv.conf, the same for every interface. The tree is that of the network namespace and
+// UTS namespace of the thread that asks first.
+//
+// Where /etc/resolv.conf cannot be read, or is no regular file, the nodes have no servers and no suffixes; where it can
+// and names none, they have empty lists. What stands past its first 64 KiB is not looked at.
+class HostSource : public TreeSource {
+ public:
+  explicit HostSource(HostSourceOptions options = {});
+
+  bool changed() override;
+
+  // Throws std::runtime_error, with one line, where the kernel cannot be asked.
+  std::shared_ptr<const TreeSnapshot> read() override;
+
+  void reopen() override;
+
+ private:
+  // What the files say.
+  struct Resolver {
+    SharedStrings servers;  // null: not known
+    SharedStrings search;
+    HostNames names;
+  };
+
+  void startWatching();
+  Resolver readResolver() const;
+  const std::string& product();
+
+  HostSourceOptions options_;
+  std::string resolvConf_;
+  std::string stubResolvConf_;  // the servers behind a local stub
+  std::string hosts_;
+
+  LinkMonitor monitor_;
+  LinkReader reader_;
+  FileWatch watch_;
+  bool watching_ = false;
+  bool filesMoved_ = true;  // the ways to the files must be walked again
+  std::string nodeName_;
+  std::string product_;  // empty until it is read
+};
+
+}  // namespace zorvagent

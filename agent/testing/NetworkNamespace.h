@@ -1,0 +1,44 @@
+// A network of its own for one test, and interfaces in it.
+#pragma once
+
+#include <libmnl/libmnl.h>
+
+#include <memory>
+#include <string>
+
+namespace zorvagent::testing {
+
+// Moves the calling process, which should be a child made for that, into a new and empty network namespace with a user
+// namespace around it where that is needed. False where the kernel does not permit it.
+bool enterNewNetwork();
+
+// Whether enterNewNetwork would work; tried in a child process.
+bool canMakeNetworks();
+
+// Makes and changes interfaces in the network namespace of the calling thread. Throws std::runtime_error where the
+// kernel refuses.
+class Interfaces {
+ public:
+  Interfaces();
+
+  void addBridge(const std::string& name);
+  void remove(const std::string& name);
+  void rename(const std::string& from, const std::string& to);
+  void setUp(const std::string& name, bool up);
+  // flags are those of IFA_FLAGS; validSeconds 0 means for ever.
+  void addAddress(const std::string& name, const std::string& address, unsigned char prefixLength,
+                  unsigned int flags = 0, unsigned int validSeconds = 0);
+
+ private:
+  void send(nlmsghdr* message, const char* what);
+
+  std::unique_ptr<mnl_socket, int (*)(mnl_socket*)> socket_;
+};
+
+#define ZORVAGENT_NEEDS_NETWORK_NAMESPACE()                                                                      \
+  if (!::zorvagent::testing::canMakeNetworks()) {                                                                \
+    GTEST_SKIP() << "this kernel or container permits no new network namespace, which this test makes links in"; \
+  }                                                                                                              \
+  static_assert(true, "a semicolon ends it")
+
+}  // namespace zorvagent::testing

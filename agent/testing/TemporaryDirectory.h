@@ -1,0 +1,63 @@
+// A directory of its own for one test.
+#pragma once
+
+#include <string>
+
+namespace zorvagent::testing {
+
+// Made under the system's temporary directory, removed with all that is in it at the end.
+class TemporaryDirectory {
+ public:
+  TemporaryDirectory();
+  ~TemporaryDirectory();
+  TemporaryDirectory(const TemporaryDirectory&) = delete;
+  TemporaryDirectory& operator=(const TemporaryDirectory&) = delete;
+
+  // Ends in a slash.
+  const std::string& path() const { return path_; }
+
+  // The path of that name in it.
+  std::string operator/(const std::string& name) const { return path_ + name; }
+
+  // Writes a file, and the directories on the way to it; returns its path.
+  std::string write(const std::string& name, const std::string& text) const;
+
+  // Makes a symbolic link, and the directories on the way to it.
+  void link(const std::string& target, const std::string& name) const;
+
+ private:
+  std::string path_;
+};
+
+// The whole file, or empty text.
+std::string contentsOf(const std::string& path);
+
+// Runs the work in a child process and waits for it. The work tells by its return value whether it went well; an
+// exception counts as no. False too where it is ended by a signal.
+template <typename Work>
+bool succeedsInChild(Work work);
+
+}  // namespace zorvagent::testing
+
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cstdio>
+#include <exception>
+
+template <typename Work>
+bool zorvagent::testing::succeedsInChild(Work work) {
+  const pid_t child = ::fork();
+  if (child == 0) {
+    bool good = false;
+    try {
+      good = work();
+    } catch (const std::exception& error) {
+      std::fprintf(stderr, "in the child: %s\n", error.what());
+    }
+    std::fflush(nullptr);
+    ::_exit(good ? 0 : 1);
+  }
+  int status = 0;
+  return child > 0 && ::waitpid(child, &status, 0) == child && WIFEXITED(status) && WEXITSTATUS(status) == 0;
+}

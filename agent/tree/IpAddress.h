@@ -1,0 +1,12 @@
+// IP addresses in text form.
+#pragma once
+
+#include <string>
+
+namespace zorvagent {
+
+// Whether the whole text is an address as inet_pton takes it; without a zone.
+bool isIPv4Address(const std::string& text);
+bool isIPv6Address(const std::string& text);
+
+}  // namespace zorvagent

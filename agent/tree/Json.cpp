@@ -1,0 +1,292 @@
+#include "agent/tree/Json.h"
+
+#include <algorithm>
+#include <iterator>
+#include <memory>
+#include <nlohmann/json.hpp>
+#include <utility>
+
+#include "agent/files/ReadFile.h"
+#include "agent/locale/Utf8.h"
+
+namespace zorvagent {
+namespace {
+
+constexpr char32_t kByteBase = 0x10EE00;
+
+bool isByte(char32_t character) { return character >= kByteBase + 0x80 && character <= kByteBase + 0xFF; }
+
+std::string bytesToJson(std::string_view bytes) {
+  std::string text;
+  text.reserve(bytes.size());
+  for (std::size_t place = 0; place < bytes.size();) {
+    const auto [character, length, valid] = decodeUtf8(bytes, place);
+    if (valid && !isByte(character)) {
+      text += bytes.substr(place, length);
+      place += length;
+    } else {
+      appendUtf8(text, kByteBase + static_cast<unsigned char>(bytes[place++]));
+    }
+  }
+  return text;
+}
+
+std::string jsonToBytes(std::string_view text) {
+  std::string bytes;
+  bytes.reserve(text.size());
+  for (std::size_t place = 0; place < text.size();) {
+    const auto [character, length, valid] = decodeUtf8(text, place);
+    if (valid && isByte(character)) {
+      bytes += static_cast<char>(static_cast<unsigned char>(character - kByteBase));
+    } else {
+      bytes += text.substr(place, length);
+    }
+    place += length;
+  }
+  return bytes;
+}
+
+// Hands the text to the parser and lets on how far that has come.
+class TrackingIterator {
+ public:
+  using iterator_category = std::input_iterator_tag;
+  using value_type = char;
+  using difference_type = std::ptrdiff_t;
+  using pointer = const char*;
+  using reference = const char&;
+
+  TrackingIterator(const char* place, const char** reached) : place_(place), reached_(reached) {}
+  reference operator*() const { return *place_; }
+  TrackingIterator& operator++() {
+    *reached_ = place_;
+    ++place_;
+    return *this;
+  }
+  bool operator==(const TrackingIterator& other) const { return place_ == other.place_; }
+
+ private:
+  const char* place_;
+  const char** reached_;  // the last character that was taken
+};
+
+// Counts lines up to the last character that the parser took. That is the end of the token at hand, or for a number the
+// character behind it, which may be a line feed but is itself still on the line.
+class LineCounter {
+ public:
+  explicit LineCounter(const std::string& text) : counted_(text.data()), reached_(text.data()) {}
+
+  const char** reached() { return &reached_; }
+
+  int line() {
+    line_ += static_cast<int>(std::count(counted_, reached_, '\n'));
+    counted_ = reached_;
+    return line_;
+  }
+
+ private:
+  const char* counted_;
+  const char* reached_;
+  int line_ = 1;
+};
+
+// Builds the value while the parser runs. The parser itself needs no stack for what stands in one another.
+class Builder : public nlohmann::json_sax<nlohmann::json> {
+ public:
+  Builder(const std::string& name, LineCounter& lines) : name_(name), lines_(lines) {}
+
+  JsonValue take() { return std::move(root_); }
+
+  // The parser goes on while its calls are answered with true.
+  bool null() override {
+    place(JsonValue::Kind::Null);
+    return true;
+  }
+  bool boolean(bool value) override {
+    place(JsonValue::Kind::Boolean).boolean = value;
+    return true;
+  }
+  bool number_integer(number_integer_t) override {
+    place(JsonValue::Kind::OtherNumber);
+    return true;
+  }
+  bool number_unsigned(number_unsigned_t value) override {
+    place(JsonValue::Kind::Number).number = value;
+    return true;
+  }
+  bool number_float(number_float_t, const string_t&) override {
+    place(JsonValue::Kind::OtherNumber);
+    return true;
+  }
+  bool string(string_t& value) override {
+    place(JsonValue::Kind::Text).text = jsonToBytes(value);
+    return true;
+  }
+  bool binary(binary_t&) override { return false; }  // JSON has none
+
+  bool start_object(std::size_t) override { return open(JsonValue::Kind::Object); }
+  bool key(string_t& value) override {
+    open_.back()->keys.push_back(jsonToBytes(value));
+    return true;
+  }
+  bool end_object() override {
+    refuseRepeatedKeys(*open_.back());
+    open_.pop_back();
+    return true;
+  }
+  bool start_array(std::size_t) override { return open(JsonValue::Kind::List); }
+  bool end_array() override {
+    open_.pop_back();
+    return true;
+  }
+
+  bool parse_error(std::size_t, const std::string&, const nlohmann::detail::exception& error) override {
+    // "[json.exception.parse_error.101] parse error at line 1, column 2: what is wrong"
+    const std::string text = error.what();
+    const std::size_t place = text.find(": ");
+    throw ConfigError(name_, lines_.line(), {}, place == std::string::npos ? text : text.substr(place + 2));
+  }
+
+ private:
+  JsonValue& place(JsonValue::Kind kind) {
+    JsonValue& value = open_.empty() ? root_ : open_.back()->items.emplace_back();
+    value.kind = kind;
+    value.line = lines_.line();
+    return value;
+  }
+
+  bool open(JsonValue::Kind kind) {
+    JsonValue& value = place(kind);
+    if (open_.size() == kDeepestJson) {
+      throw ConfigError(name_, value.line, {},
+                        "lists and objects stand more than " + std::to_string(kDeepestJson) + " deep in one another");
+    }
+    open_.push_back(&value);
+    return true;
+  }
+
+  void refuseRepeatedKeys(const JsonValue& object) const {
+    std::vector<std::string_view> keys(object.keys.begin(), object.keys.end());
+    std::sort(keys.begin(), keys.end());
+    const auto repeated = std::adjacent_find(keys.begin(), keys.end());
+    if (repeated != keys.end()) {
+      throw ConfigError(name_, object.line, std::string(*repeated), "stands twice in one object");
+    }
+  }
+
+  const std::string& name_;
+  LineCounter& lines_;
+  JsonValue root_;
+  // The lists and objects that are open. A pointer into items stays good: only the innermost one grows.
+  std::vector<JsonValue*> open_;
+};
+
+constexpr std::size_t kIndent = 2;
+
+void format(std::string& text, const JsonValue& value, std::size_t depth);
+
+void startLine(std::string& text, std::size_t depth) {
+  text += '\n';
+  text.append(depth * kIndent, ' ');
+}
+
+std::string quoted(const std::string& bytes) { return nlohmann::json(bytesToJson(bytes)).dump(); }
+
+// The elements of a list or the members of an object, each on a line of its own.
+void formatItems(std::string& text, const JsonValue& value, std::size_t depth) {
+  for (std::size_t i = 0; i < value.items.size(); ++i) {
+    if (i != 0) text += ',';
+    startLine(text, depth + 1);
+    if (!value.keys.empty()) text += quoted(value.keys[i]) + ": ";
+    format(text, value.items[i], depth + 1);
+  }
+  if (!value.items.empty()) startLine(text, depth);
+}
+
+void format(std::string& text, const JsonValue& value, std::size_t depth) {
+  switch (value.kind) {
+    case JsonValue::Kind::Boolean:
+      text += value.boolean ? "true" : "false";
+      return;
+    case JsonValue::Kind::Number:
+      text += std::to_string(value.number);
+      return;
+    case JsonValue::Kind::Text:
+      text += quoted(value.text);
+      return;
+    case JsonValue::Kind::List:
+    case JsonValue::Kind::Object: {
+      const bool isList = value.kind == JsonValue::Kind::List;
+      text += isList ? '[' : '{';
+      formatItems(text, value, depth);
+      text += isList ? ']' : '}';
+      return;
+    }
+    default:
+      text += "null";  // what is never written: the agent's values have no such kinds
+  }
+}
+
+}  // namespace
+
+JsonValue JsonValue::ofText(std::string text) {
+  JsonValue value;
+  value.kind = Kind::Text;
+  value.text = std::move(text);
+  return value;
+}
+
+JsonValue JsonValue::ofNumber(std::uint64_t number) {
+  JsonValue value;
+  value.kind = Kind::Number;
+  value.number = number;
+  return value;
+}
+
+JsonValue JsonValue::list() {
+  JsonValue value;
+  value.kind = Kind::List;
+  return value;
+}
+
+JsonValue JsonValue::object() {
+  JsonValue value;
+  value.kind = Kind::Object;
+  return value;
+}
+
+void JsonValue::add(std::string key, JsonValue value) {
+  keys.push_back(std::move(key));
+  items.push_back(std::move(value));
+}
+
+void JsonValue::add(JsonValue value) { items.push_back(std::move(value)); }
+
+const JsonValue* JsonValue::find(std::string_view key) const {
+  const auto found = std::find(keys.begin(), keys.end(), key);
+  return found == keys.end() ? nullptr : &items[static_cast<std::size_t>(found - keys.begin())];
+}
+
+JsonValue parseJson(const std::string& text, const std::string& name) {
+  if (text.size() > kLargestJson) throw ConfigError(name, 0, {}, "is larger than 64 MiB");
+  LineCounter lines(text);
+  Builder builder(name, lines);
+  const TrackingIterator begin(text.data(), lines.reached());
+  const TrackingIterator end(text.data() + text.size(), lines.reached());
+  nlohmann::json::sax_parse(begin, end, &builder);
+  return builder.take();
+}
+
+JsonValue readJsonFile(const std::string& path) {
+  const FileText file = readFile(path, kLargestJson);
+  if (file.error != 0) throw ConfigError(path, 0, {}, "cannot be read: " + fileErrorText(file.error));
+  if (file.truncated) throw ConfigError(path, 0, {}, "is larger than 64 MiB");
+  return parseJson(file.text, path);
+}
+
+std::string formatJson(const JsonValue& value) {
+  std::string text;
+  format(text, value, 0);
+  return text + '\n';
+}
+
+}  // namespace zorvagent

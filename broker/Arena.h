@@ -1,0 +1,107 @@
+#pragma once
+
+#include <cstddef>
+#include <mutex>
+#include <new>
+#include <string_view>
+#include <type_traits>
+#include <utility>
+
+// The memory of one request: it is handed out by moving a pointer and given back all at once, with the arena. What lives
+// in it has no destructor.
+//
+// An arena belongs to one thread at a time. share() makes allocation safe for several, at the cost of a lock each time.
+
+namespace zorva::broker {
+
+class ClassInfo;
+class ClassTable;
+struct StringObject;
+
+class Arena {
+ public:
+  /// `classes` is what objects in this arena ask about their class; it outlives the arena. Null only where neither a path
+  /// nor an instance will live here. The first block of memory has `firstBlock` bytes, later ones are larger.
+  explicit Arena(const ClassTable* classes, std::size_t firstBlock = 4096) : classes_(classes), next_(firstBlock) {}
+  ~Arena();
+  Arena(const Arena&) = delete;
+  Arena& operator=(const Arena&) = delete;
+
+  const ClassTable* classes() const noexcept { return classes_; }
+
+  /// Memory aligned for pointers and 64-bit numbers. Throws std::bad_alloc.
+  void* allocate(std::size_t size) {
+    if (shared_) return allocateShared(size);
+    return take(size);
+  }
+
+  template <class T, class... Args>
+  T* make(Args&&... args) {
+    static_assert(std::is_trivially_destructible_v<T> && alignof(T) <= alignof(std::max_align_t));
+    return new (allocate(sizeof(T))) T(std::forward<Args>(args)...);
+  }
+
+  /// `count` values of T, value-initialised.
+  template <class T>
+  T* makeArray(std::size_t count) {
+    static_assert(std::is_trivially_destructible_v<T> && alignof(T) <= alignof(std::max_align_t));
+    if (count > kMost / sizeof(T)) throw std::bad_alloc();
+    return new (allocate(count == 0 ? 1 : count * sizeof(T))) T[count == 0 ? 1 : count]();
+  }
+
+  /// A copy of `text`, ended by a NUL.
+  const char* text(std::string_view text);
+
+  /// From here on several threads may allocate. Call it before the second thread learns of the arena.
+  void share() noexcept { shared_ = true; }
+  bool isShared() const noexcept { return shared_; }
+
+  /// An arena made by clone() holds one object and what belongs to it, and is deleted by that object's release(). Null
+  /// for the arena of a request.
+  const void* root() const noexcept { return root_; }
+  void setRoot(const void* root) noexcept { root_ = root; }
+
+  /// The class of that name, or null. The last few are remembered: an operation makes many objects of few classes.
+  const ClassInfo* findClass(std::string_view name);
+
+  /// A text object with that content, an earlier one where it is among the last few: namespaces, hosts and names repeat.
+  StringObject* intern(std::string_view text);
+
+  /// Bytes of memory held.
+  std::size_t size() const noexcept { return size_; }
+
+ private:
+  struct Block {
+    Block* previous;
+  };
+  static constexpr std::size_t kMost = static_cast<std::size_t>(1) << 40;
+  static constexpr std::size_t kLargestBlock = 256 * 1024;
+  static constexpr unsigned kRemembered = 4;
+
+  void* take(std::size_t size) {
+    const std::size_t rounded = (size + 15) & ~static_cast<std::size_t>(15);
+    if (rounded > static_cast<std::size_t>(end_ - position_)) return takeFromNewBlock(rounded);
+    void* memory = position_;
+    position_ += rounded;
+    return memory;
+  }
+  void* takeFromNewBlock(std::size_t size);
+  void* allocateShared(std::size_t size);
+  char* addBlock(std::size_t size);
+
+  const ClassTable* classes_;
+  std::size_t next_;  // of the next block
+  char* position_ = nullptr;
+  char* end_ = nullptr;
+  Block* blocks_ = nullptr;
+  std::size_t size_ = 0;
+  const void* root_ = nullptr;
+  bool shared_ = false;
+  std::mutex mutex_;
+  const ClassInfo* recentClasses_[kRemembered] = {};
+  StringObject* recentTexts_[kRemembered] = {};
+  unsigned nextClass_ = 0;
+  unsigned nextText_ = 0;
+};
+
+}  // namespace zorva::broker

@@ -1,0 +1,282 @@
+#include "broker/Broker.h"
+
+#include <exception>
+#include <utility>
+
+#include "broker/BrokerCore.h"
+#include "broker/Convert.h"
+#include "broker/Data.h"
+#include "broker/Request.h"
+
+namespace zorva::broker {
+
+namespace {
+
+/// Fills one plain value again and again and hands it to the client's sinks.
+class SinkTaker : public Taker {
+ public:
+  SinkTaker(const InstanceSink* instances, const PathSink* paths) : instances_(instances), paths_(paths) {}
+
+  bool takeInstance(const InstanceObject& object, const PropertyMask& wanted) override {
+    fillInstance(object, wanted, instance_);
+    return (*instances_)(instance_);
+  }
+
+  bool takePath(const PathObject& object) override {
+    fillPath(object, instance_.path);
+    return (*paths_)(instance_.path);
+  }
+
+ private:
+  const InstanceSink* instances_;
+  const PathSink* paths_;
+  Instance instance_;
+};
+
+/// Takes the one result that there is.
+class OneTaker : public Taker {
+ public:
+  OneTaker(Instance* instance, ObjectPath* path) : instance_(instance), path_(path) {}
+  bool takeInstance(const InstanceObject& object, const PropertyMask& wanted) override {
+    fillInstance(object, wanted, *instance_);
+    return true;
+  }
+  bool takePath(const PathObject& object) override {
+    fillPath(object, *path_);
+    return true;
+  }
+
+ private:
+  Instance* instance_;
+  ObjectPath* path_;
+};
+
+CMPIFlags flagsOf(const Selection& selection) noexcept {
+  return (selection.localOnly ? CMPI_FLAG_LocalOnly : 0U) |
+         (selection.deepInheritance ? CMPI_FLAG_DeepInheritance : 0U) |
+         (selection.includeQualifiers ? CMPI_FLAG_IncludeQualifiers : 0U) |
+         (selection.includeClassOrigin ? CMPI_FLAG_IncludeClassOrigin : 0U);
+}
+
+void describe(ContextObject& context, const Caller& caller, CMPIFlags flags) {
+  context.setFlags(flags);
+  if (!caller.principal.empty()) context.setText(CMPIPrincipal, caller.principal);
+  if (!caller.role.empty()) context.setText(CMPIRole, caller.role);
+  if (!caller.acceptLanguage.empty()) context.setText(CMPIAcceptLanguage, caller.acceptLanguage);
+  if (!caller.contentLanguage.empty()) context.setText(CMPIContentLanguage, caller.contentLanguage);
+}
+
+std::optional<std::vector<std::string_view>> viewsOf(const std::optional<std::vector<std::string>>& names) {
+  if (!names) return std::nullopt;
+  return std::vector<std::string_view>(names->begin(), names->end());
+}
+
+/// Of associators and references: there, inheritance is always deep and properties are never local only.
+Shape listOnly(const Selection& selection) {
+  Shape shape;
+  shape.properties = viewsOf(selection.propertyList);
+  return shape;
+}
+
+Shape shapeOf(const Selection& selection) {
+  Shape shape = listOnly(selection);
+  shape.localOnly = selection.localOnly;
+  shape.deepInheritance = selection.deepInheritance;
+  return shape;
+}
+
+FarEnd farEndOf(const AssociationFilter& filter) noexcept {
+  return {filter.associationClass, filter.resultClass, filter.role, filter.resultRole};
+}
+
+/// Opens a request and runs `operation(Request&)` in it. What it throws is want of memory, or comes from a sink.
+template <class Operation>
+Status inRequest(BrokerCore& core, const Caller& caller, CMPIFlags flags, Operation&& operation) {
+  try {
+    Request request(core);
+    describe(request.context(), caller, flags);
+    return operation(request);
+  } catch (const std::exception& problem) {
+    return {CMPI_RC_ERR_FAILED, problem.what()};
+  }
+}
+
+}  // namespace
+
+Broker::Broker(std::shared_ptr<const schema::ClassRepository> classes, BrokerOptions options)
+    : core_(std::make_unique<BrokerCore>(std::move(classes), std::move(options))) {}
+
+Broker::~Broker() = default;
+
+Status Broker::enumerateInstances(std::string_view nameSpace, std::string_view className, const Selection& selection,
+                                  const InstanceSink& sink, const Caller& caller) {
+  return inRequest(*core_, caller, flagsOf(selection), [&](Request& request) {
+    SinkTaker taker(&sink, nullptr);
+    return request.enumerate(*PathObject::make(request.arena(), nameSpace, className), Form::Instances,
+                             shapeOf(selection), taker);
+  });
+}
+
+Status Broker::enumerateInstanceNames(std::string_view nameSpace, std::string_view className, const PathSink& sink,
+                                      const Caller& caller) {
+  return inRequest(*core_, caller, 0, [&](Request& request) {
+    SinkTaker taker(nullptr, &sink);
+    return request.enumerate(*PathObject::make(request.arena(), nameSpace, className), Form::Paths, Shape(), taker);
+  });
+}
+
+Status Broker::getInstance(const ObjectPath& path, const Selection& selection, Instance& instance,
+                           const Caller& caller) {
+  return inRequest(*core_, caller, flagsOf(selection), [&](Request& request) {
+    PathObject* name = nullptr;
+    Status status = makePath(request.arena(), path, true, name);
+    if (!status.ok()) return status;
+    OneTaker taker(&instance, nullptr);
+    Shape shape = shapeOf(selection);
+    shape.deepInheritance = true;
+    return request.get(*name, shape, taker);
+  });
+}
+
+Status Broker::createInstance(const Instance& instance, ObjectPath& created, const Caller& caller) {
+  return inRequest(*core_, caller, 0, [&](Request& request) {
+    PathObject* name = nullptr;
+    InstanceObject* object = nullptr;
+    Status status = makePath(request.arena(), instance.path, true, name);
+    if (status.ok()) status = makeInstance(request.arena(), *name, instance, object);
+    if (!status.ok()) return status;
+    OneTaker taker(nullptr, &created);
+    return request.create(*object->path(request.arena()), *object, taker);
+  });
+}
+
+Status Broker::modifyInstance(const Instance& instance, const std::optional<std::vector<std::string>>& propertyList,
+                              const Caller& caller) {
+  return inRequest(*core_, caller, 0, [&](Request& request) {
+    PathObject* name = nullptr;
+    InstanceObject* object = nullptr;
+    Status status = makePath(request.arena(), instance.path, true, name);
+    if (status.ok()) status = makeInstance(request.arena(), *name, instance, object);
+    if (!status.ok()) return status;
+    Shape shape;
+    shape.properties = viewsOf(propertyList);
+    return request.modify(*name, *object, shape);
+  });
+}
+
+Status Broker::deleteInstance(const ObjectPath& path, const Caller& caller) {
+  return inRequest(*core_, caller, 0, [&](Request& request) {
+    PathObject* name = nullptr;
+    const Status status = makePath(request.arena(), path, true, name);
+    return status.ok() ? request.remove(*name) : status;
+  });
+}
+
+Status Broker::associators(const ObjectPath& path, const AssociationFilter& filter, const Selection& selection,
+                           const InstanceSink& sink, const Caller& caller) {
+  return inRequest(*core_, caller, flagsOf(selection), [&](Request& request) {
+    PathObject* name = nullptr;
+    const Status status = makePath(request.arena(), path, true, name);
+    if (!status.ok()) return status;
+    SinkTaker taker(&sink, nullptr);
+    return request.associated(*name, Form::Instances, farEndOf(filter), listOnly(selection), taker);
+  });
+}
+
+Status Broker::associatorNames(const ObjectPath& path, const AssociationFilter& filter, const PathSink& sink,
+                               const Caller& caller) {
+  return inRequest(*core_, caller, 0, [&](Request& request) {
+    PathObject* name = nullptr;
+    const Status status = makePath(request.arena(), path, true, name);
+    if (!status.ok()) return status;
+    SinkTaker taker(nullptr, &sink);
+    return request.associated(*name, Form::Paths, farEndOf(filter), Shape(), taker);
+  });
+}
+
+Status Broker::references(const ObjectPath& path, const AssociationFilter& filter, const Selection& selection,
+                          const InstanceSink& sink, const Caller& caller) {
+  return inRequest(*core_, caller, flagsOf(selection), [&](Request& request) {
+    PathObject* name = nullptr;
+    const Status status = makePath(request.arena(), path, true, name);
+    if (!status.ok()) return status;
+    SinkTaker taker(&sink, nullptr);
+    return request.referring(*name, Form::Instances, farEndOf(filter), listOnly(selection), taker);
+  });
+}
+
+Status Broker::referenceNames(const ObjectPath& path, const AssociationFilter& filter, const PathSink& sink,
+                              const Caller& caller) {
+  return inRequest(*core_, caller, 0, [&](Request& request) {
+    PathObject* name = nullptr;
+    const Status status = makePath(request.arena(), path, true, name);
+    if (!status.ok()) return status;
+    SinkTaker taker(nullptr, &sink);
+    return request.referring(*name, Form::Paths, farEndOf(filter), Shape(), taker);
+  });
+}
+
+namespace {
+
+/// The input of a method as data of the declared types.
+Status makeArguments(Arena& arena, const PathObject& path, std::string_view method,
+                     const std::vector<NamedValue>& input, EntryList& arguments) {
+  const schema::ClassMethod* declared = path.info->declared().findMethod(method);
+  if (declared == nullptr) return {};  // the request itself says so
+  for (const NamedValue& argument : input) {
+    for (const schema::Parameter& parameter : declared->parameters) {
+      if (!schema::sameName(parameter.name, argument.name)) continue;
+      CMPIData data;
+      Status status = makeData(arena, declaredType(parameter), argument.value, declared->name + "." + parameter.name,
+                               data);
+      if (!status.ok()) return status;
+      arguments.set(arena, arena.intern(parameter.name), data);
+    }
+    if (arguments.find(argument.name) == nullptr) {
+      return {CMPI_RC_ERR_INVALID_PARAMETER, declared->name + " has no parameter " + argument.name};
+    }
+  }
+  return {};
+}
+
+}  // namespace
+
+Status Broker::invokeMethod(const ObjectPath& path, std::string_view method, const std::vector<NamedValue>& input,
+                            MethodResult& result, const Caller& caller) {
+  return inRequest(*core_, caller, 0, [&](Request& request) {
+    PathObject* name = nullptr;
+    EntryList arguments;
+    Status status = makePath(request.arena(), path, true, name);
+    if (status.ok()) status = makeArguments(request.arena(), *name, method, input, arguments);
+    if (!status.ok()) return status;
+    EntryList output;
+    CMPIData value = nullData(CMPI_null);
+    status = request.invoke(*name, method, arguments, value, output);
+    fillValue(value, result.returnValue);
+    result.output.resize(output.size());
+    for (std::uint32_t i = 0; i < output.size(); ++i) {
+      result.output[i].name = output[i].name->view();
+      fillValue(output[i].data, result.output[i].value);
+    }
+    return status;
+  });
+}
+
+const schema::ClassRepository& Broker::classes() const noexcept { return core_->classes().repository(); }
+
+const ProviderRegistry& Broker::registry() const noexcept { return core_->registry(); }
+
+Status Broker::canonicalPath(const ObjectPath& path, ObjectPath& canonical) const {
+  return inRequest(*core_, {}, 0, [&](Request& request) {
+    PathObject* name = nullptr;
+    PathObject* resolved = nullptr;
+    Status status = makePath(request.arena(), path, true, name);
+    if (status.ok()) status = request.resolve(*name, resolved);
+    if (status.ok()) fillPath(*resolved, canonical);
+    return status;
+  });
+}
+
+const CMPIBroker* Broker::handle() const noexcept { return core_->handle(); }
+
+}  // namespace zorva::broker

@@ -1,0 +1,151 @@
+#pragma once
+
+#include <functional>
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "broker/ProviderRegistry.h"
+#include "broker/Value.h"
+#include "schema/ClassRepository.h"
+
+// A CMPI 2.0 broker in this process: it loads providers, asks them what a client asks, and is what they call back to.
+//
+// Threads: after its construction one Broker may be used by any number of threads at once; each request runs on the
+// thread that makes it, with memory of its own that is gone when the request ends. Sinks are called on that thread (save
+// where a provider delivers from an attached thread: then one call at a time). The log hook may be called on any thread.
+//
+// Names of classes, properties, keys, methods, parameters and namespaces are taken in any case and handed on, and given
+// back, in the schema's own spelling. An empty namespace stands for the registry's default.
+//
+// Failures are values: no function here throws, except for want of memory in building what the caller holds.
+
+struct _CMPIBroker;
+
+namespace zorva::broker {
+
+class BrokerCore;
+
+enum class LogLevel { Debug, Info, Warning, Error };
+
+/// Takes one line of the broker's or, through the broker, of a provider's log.
+using LogHook = std::function<void(LogLevel level, std::string_view text)>;
+
+struct BrokerOptions {
+  ProviderRegistry registry = ProviderRegistry::builtIn();
+  std::string providerDirectory;  ///< where libraries named without "/" lie; empty: the dynamic loader's own search
+  LogHook log;                    ///< may be empty
+};
+
+/// What the providers learn of the client, as entries of the CMPI context. Empty texts make no entry.
+struct Caller {
+  std::string principal;
+  std::string role;
+  std::string acceptLanguage;
+  std::string contentLanguage;
+};
+
+/// What of each instance is wanted (DSP0200 5.3.2.2, 5.3.2.11). Qualifiers and class origins are added by who writes the
+/// answer, from Property::declaration; here they are only told to the provider.
+struct Selection {
+  bool localOnly = false;
+  bool deepInheritance = true;
+  bool includeQualifiers = false;
+  bool includeClassOrigin = false;
+  /// Absent: all properties. Names that the class lacks are passed over. Keys come only if they are named; the path of
+  /// the instance has them all the same.
+  std::optional<std::vector<std::string>> propertyList;
+};
+
+/// Which associations and far ends are wanted; empty texts stand for what is omitted. For references,
+/// `associationClass` is the operation's ResultClass, and `resultClass` and `resultRole` are not used.
+struct AssociationFilter {
+  std::string associationClass;
+  std::string resultClass;
+  std::string role;
+  std::string resultRole;
+};
+
+/// Takes results one by one while the provider makes them. What is referred to is the broker's and holds until the sink
+/// returns: copy what is to be kept. false: no more are wanted; the operation then ends as soon as the provider does.
+using InstanceSink = std::function<bool(const Instance& instance)>;
+using PathSink = std::function<bool(const ObjectPath& path)>;
+
+/// What a method gave back.
+struct MethodResult {
+  Value returnValue;               ///< null where the provider returned none
+  std::vector<NamedValue> output;  ///< in the order in which the provider set them
+};
+
+class Broker {
+ public:
+  /// `classes` are those of every namespace of the registry.
+  Broker(std::shared_ptr<const schema::ClassRepository> classes, BrokerOptions options);
+
+  /// Tells the providers that they end and closes their libraries. No request may be running.
+  ~Broker();
+  Broker(const Broker&) = delete;
+  Broker& operator=(const Broker&) = delete;
+
+  /// The instances of a class and of the classes below it that are served, the class itself first. CIM_ERR_NOT_SUPPORTED
+  /// where nobody serves any of them. The status comes after all results; results may have come before a failure.
+  /// A provider library that cannot be loaded fails the request where the class asked for is its own; a request for a
+  /// superclass passes over it with a line in the log, unless nothing else is left.
+  Status enumerateInstances(std::string_view nameSpace, std::string_view className, const Selection& selection,
+                            const InstanceSink& sink, const Caller& caller = {});
+  Status enumerateInstanceNames(std::string_view nameSpace, std::string_view className, const PathSink& sink,
+                                const Caller& caller = {});
+
+  /// One instance. Key values may be texts where the schema says otherwise (an untyped KEYVALUE, a path text): they are
+  /// turned into the key's type; a text at a reference is read as a path text. Keys may be missing: the provider decides.
+  /// CIM_ERR_NOT_FOUND where the provider returns nothing.
+  Status getInstance(const ObjectPath& path, const Selection& selection, Instance& instance,
+                     const Caller& caller = {});
+
+  /// `instance.path` names class and namespace. `created` gets the name of what was made.
+  Status createInstance(const Instance& instance, ObjectPath& created, const Caller& caller = {});
+
+  /// `instance.path` names what is to be changed; `propertyList` what of it (absent: all that `instance` has).
+  Status modifyInstance(const Instance& instance, const std::optional<std::vector<std::string>>& propertyList,
+                        const Caller& caller = {});
+
+  Status deleteInstance(const ObjectPath& path, const Caller& caller = {});
+
+  /// The objects at the far ends of the associations of `path`. Every concrete served association that fits the filter is
+  /// asked under its own name; what comes back is checked against `resultClass`. A class in the filter that does not
+  /// exist is CIM_ERR_INVALID_PARAMETER. Where several associations are asked, one that answers "not supported" or whose
+  /// library cannot be loaded is passed over (the latter with a line in the log) unless all are so; after any other
+  /// failure the rest are still asked, and the first failure is the status.
+  Status associators(const ObjectPath& path, const AssociationFilter& filter, const Selection& selection,
+                     const InstanceSink& sink, const Caller& caller = {});
+  Status associatorNames(const ObjectPath& path, const AssociationFilter& filter, const PathSink& sink,
+                         const Caller& caller = {});
+
+  /// The associations themselves.
+  Status references(const ObjectPath& path, const AssociationFilter& filter, const Selection& selection,
+                    const InstanceSink& sink, const Caller& caller = {});
+  Status referenceNames(const ObjectPath& path, const AssociationFilter& filter, const PathSink& sink,
+                        const Caller& caller = {});
+
+  /// Calls an extrinsic method. Parameters are turned into the types that the schema declares.
+  Status invokeMethod(const ObjectPath& path, std::string_view method, const std::vector<NamedValue>& input,
+                      MethodResult& result, const Caller& caller = {});
+
+  const schema::ClassRepository& classes() const noexcept;
+  const ProviderRegistry& registry() const noexcept;
+
+  /// `path` as the providers would see it: names in the schema's spelling, key values in the schema's types, in the order
+  /// of the schema's keys. The same failures as a request with that path has.
+  Status canonicalPath(const ObjectPath& path, ObjectPath& canonical) const;
+
+  /// The broker as providers see it, for what speaks CMPI itself. CMPI objects can be made only while a Scope is open on
+  /// the thread (broker/Scope.h).
+  const _CMPIBroker* handle() const noexcept;
+
+ private:
+  std::unique_ptr<BrokerCore> core_;
+};
+
+}  // namespace zorva::broker

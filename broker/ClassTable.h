@@ -1,0 +1,68 @@
+#pragma once
+
+#include <cstdint>
+#include <deque>
+#include <memory>
+#include <shared_mutex>
+#include <string_view>
+#include <unordered_map>
+#include <vector>
+
+#include "broker/Objects.h"
+#include "broker/ProviderRegistry.h"
+#include "schema/ClassRepository.h"
+
+// The schema as the broker's objects need it: the names as CMPI texts, the types as CMPI types, and look-ups that cost
+// next to nothing. Made class by class when one is first asked for.
+
+namespace zorva::broker {
+
+/// A class as the broker's objects see it. Immutable.
+class ClassInfo {
+ public:
+  explicit ClassInfo(const schema::Class& declared);
+  ClassInfo(const ClassInfo&) = delete;
+  ClassInfo& operator=(const ClassInfo&) = delete;
+
+  const schema::Class& declared() const noexcept { return declared_; }
+  const std::string& name() const noexcept { return declared_.name(); }
+  StringObject* nameObject() const noexcept { return const_cast<StringObject*>(&nameObject_); }
+  const std::vector<PropertyInfo>& properties() const noexcept { return properties_; }
+  const std::vector<const PropertyInfo*>& keys() const noexcept { return keys_; }
+
+  /// Null where the class has no such property; the name in any case.
+  const PropertyInfo* find(std::string_view name) const noexcept;
+
+  bool isA(const ClassInfo& ancestor) const noexcept { return declared_.isA(ancestor.declared_); }
+
+ private:
+  const schema::Class& declared_;
+  StringObject nameObject_;
+  std::deque<StringObject> names_;  // they stay where they are made: others point at them
+  std::vector<PropertyInfo> properties_;
+  std::vector<const PropertyInfo*> keys_;
+  // Open addressing: index + 1 of the property whose name hashes here, 0 for none. At most half full.
+  std::vector<std::uint16_t> buckets_;
+};
+
+/// All classes of a broker. Safe on any thread.
+class ClassTable {
+ public:
+  explicit ClassTable(std::shared_ptr<const schema::ClassRepository> repository);
+
+  const schema::ClassRepository& repository() const noexcept { return *repository_; }
+
+  /// Null where the schema has no such class; the name in any case. What is given lives as long as the table.
+  const ClassInfo* find(std::string_view name) const;
+  const ClassInfo& of(const schema::Class& declared) const { return *find(declared.name()); }
+
+ private:
+  const std::shared_ptr<const schema::ClassRepository> repository_;
+  mutable std::shared_mutex mutex_;
+  mutable std::unordered_map<std::string_view, std::unique_ptr<ClassInfo>, schema::NameHash, schema::NameEqual> classes_;
+};
+
+/// The CMPI type of a schema's type.
+CMPIType cmpiType(schema::Type type, bool isArray) noexcept;
+
+}  // namespace zorva::broker

@@ -1,0 +1,149 @@
+#include "broker/ProviderLoader.h"
+
+#include <dlfcn.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <exception>
+
+#include "broker/BrokerCore.h"
+#include "broker/Data.h"
+#include "broker/Scope.h"
+
+namespace zorva::broker {
+
+struct ProviderLoader::Library {
+  explicit Library(void* opened) : handle(opened) {}
+  ~Library() {
+    if (!stays) dlclose(handle);
+  }
+  Library(const Library&) = delete;
+  Library& operator=(const Library&) = delete;
+
+  void* handle;
+  bool stays = false;
+};
+
+namespace {
+
+/// The files that a library's name may stand for, best first.
+std::vector<std::string> candidates(const std::string& directory, const std::string& name) {
+  if (name.find('/') != std::string::npos) return {name};
+  const std::string stem = (directory.empty() ? "" : directory + "/") + "lib" + name + ".so";
+  return {stem + ".1", stem};
+}
+
+}  // namespace
+
+ProviderLoader::ProviderLoader(BrokerCore& core, const ProviderRegistry& registry, std::string directory)
+    : core_(core), directory_(std::move(directory)) {
+  for (const ProviderEntry& entry : registry.entries()) {
+    const bool known = std::any_of(providers_.begin(), providers_.end(), [&](const auto& provider) {
+      return provider->prefix == entry.prefix && provider->library == entry.library;
+    });
+    if (known) continue;
+    providers_.push_back(std::make_unique<Provider>());
+    providers_.back()->prefix = entry.prefix;
+    providers_.back()->library = entry.library;
+    providers_.back()->nameSpace = entry.nameSpace;
+  }
+}
+
+ProviderLoader::~ProviderLoader() {
+  for (const auto& provider : providers_) {
+    const bool stays = cleanUp(*provider, &Provider::instance) | cleanUp(*provider, &Provider::association) |
+                       cleanUp(*provider, &Provider::method);
+    if (stays) libraries_.at(provider->library)->stays = true;
+  }
+}
+
+template <class Mi>
+bool ProviderLoader::cleanUp(Provider& provider, std::atomic<const Mi*> Provider::*slot) noexcept {
+  const Mi* mi = (provider.*slot).load();
+  if (mi == nullptr || mi->ft->cleanup == nullptr) return false;
+  try {
+    Scope scope(core_);
+    auto* context = scope.arena().make<ContextObject>(scope.arena());
+    const CMPIStatus status = mi->ft->cleanup(const_cast<Mi*>(mi), context, 1);
+    return status.rc == CMPI_RC_DO_NOT_UNLOAD || status.rc == CMPI_RC_NEVER_UNLOAD;
+  } catch (...) {
+    core_.log(LogLevel::Warning, provider.prefix + " threw an exception out of its cleanup");
+    return false;
+  }
+}
+
+ProviderLoader::Provider& ProviderLoader::providerOf(const ProviderEntry& entry) const {
+  return **std::find_if(providers_.begin(), providers_.end(), [&](const auto& provider) {
+    return provider->prefix == entry.prefix && provider->library == entry.library;
+  });
+}
+
+ProviderLoader::Library* ProviderLoader::open(const std::string& name, Status& status) {
+  const auto known = libraries_.find(name);
+  if (known != libraries_.end()) return known->second.get();
+  const std::vector<std::string> files = candidates(directory_, name);
+  const bool searched = files.front().find('/') == std::string::npos;
+  std::string problem;
+  for (const std::string& file : files) {
+    if (!searched && access(file.c_str(), F_OK) != 0) continue;
+    if (void* handle = dlopen(file.c_str(), RTLD_NOW | RTLD_LOCAL)) {
+      return libraries_.emplace(name, std::make_unique<Library>(handle)).first->second.get();
+    }
+    if (problem.empty()) problem = dlerror();
+  }
+  status.rc = CMPI_RC_ERR_FAILED;
+  status.message = problem.empty() ? "there is no provider library " + files.front()
+                                   : "the provider library cannot be loaded: " + problem;
+  return nullptr;
+}
+
+template <class Mi>
+const Mi* ProviderLoader::make(Provider& provider, std::atomic<const Mi*> Provider::*slot, const char* kind,
+                               Status& status) {
+  if (const Mi* made = (provider.*slot).load(std::memory_order_acquire)) return made;
+  const std::lock_guard lock(mutex_);
+  if (const Mi* made = (provider.*slot).load(std::memory_order_relaxed)) return made;
+  Library* library = open(provider.library, status);
+  if (library == nullptr) return nullptr;
+  const std::string function = provider.prefix + "_Create_" + kind;
+  using Create = Mi* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
+  const auto create = reinterpret_cast<Create>(dlsym(library->handle, function.c_str()));
+  status.rc = CMPI_RC_ERR_FAILED;
+  if (create == nullptr) {
+    status.message = "the provider library " + provider.library + " has no function " + function;
+    return nullptr;
+  }
+  Scope scope(core_);
+  auto* context = scope.arena().make<ContextObject>(scope.arena());
+  context->setText(CMPIInitNameSpace, provider.nameSpace);
+  CMPIStatus created{CMPI_RC_OK, nullptr};
+  Mi* mi = nullptr;
+  try {
+    mi = create(core_.handle(), context, &created);
+  } catch (const std::exception& problem) {
+    status.message = function + " threw an exception: " + problem.what();
+    return nullptr;
+  }
+  if (mi == nullptr || mi->ft == nullptr || created.rc != CMPI_RC_OK) {
+    status.message = function + " made no provider";
+    if (created.msg != nullptr) status.message += ": " + std::string(textOf(created.msg));
+    return nullptr;
+  }
+  status = {};
+  (provider.*slot).store(mi, std::memory_order_release);
+  return mi;
+}
+
+const CMPIInstanceMI* ProviderLoader::instanceMi(const ProviderEntry& entry, Status& status) {
+  return make(providerOf(entry), &Provider::instance, "InstanceMI", status);
+}
+
+const CMPIAssociationMI* ProviderLoader::associationMi(const ProviderEntry& entry, Status& status) {
+  return make(providerOf(entry), &Provider::association, "AssociationMI", status);
+}
+
+const CMPIMethodMI* ProviderLoader::methodMi(const ProviderEntry& entry, Status& status) {
+  return make(providerOf(entry), &Provider::method, "MethodMI", status);
+}
+
+}  // namespace zorva::broker

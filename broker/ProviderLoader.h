@@ -1,0 +1,63 @@
+#pragma once
+
+#include <atomic>
+#include <memory>
+#include <mutex>
+#include <string>
+#include <unordered_map>
+#include <vector>
+
+#include "broker/ProviderRegistry.h"
+#include "broker/Value.h"
+#include "cmpidt.h"
+#include "cmpift.h"
+
+// Loads provider libraries when the first request needs them, and makes each provider's MIs once. Safe on any thread.
+
+namespace zorva::broker {
+
+class BrokerCore;
+
+class ProviderLoader {
+ public:
+  ProviderLoader(BrokerCore& core, const ProviderRegistry& registry, std::string directory);
+
+  /// Calls the cleanup of every MI that was made, then closes the libraries, save those that ask to stay.
+  ~ProviderLoader();
+  ProviderLoader(const ProviderLoader&) = delete;
+  ProviderLoader& operator=(const ProviderLoader&) = delete;
+
+  /// The MI of an entry of the registry; null with a failure that says what is missing. A failure is not remembered: the
+  /// next request tries again.
+  const CMPIInstanceMI* instanceMi(const ProviderEntry& entry, Status& status);
+  const CMPIAssociationMI* associationMi(const ProviderEntry& entry, Status& status);
+  const CMPIMethodMI* methodMi(const ProviderEntry& entry, Status& status);
+
+ private:
+  struct Library;
+  /// One prefix in one library; several entries of the registry may share it.
+  struct Provider {
+    std::string prefix;
+    std::string library;
+    std::string nameSpace;
+    std::atomic<const CMPIInstanceMI*> instance = nullptr;
+    std::atomic<const CMPIAssociationMI*> association = nullptr;
+    std::atomic<const CMPIMethodMI*> method = nullptr;
+  };
+
+  Provider& providerOf(const ProviderEntry& entry) const;
+  Library* open(const std::string& name, Status& status);
+  template <class Mi>
+  const Mi* make(Provider& provider, std::atomic<const Mi*> Provider::*slot, const char* kind, Status& status);
+  template <class Mi>
+  bool cleanUp(Provider& provider, std::atomic<const Mi*> Provider::*slot) noexcept;
+
+  BrokerCore& core_;
+  const std::string directory_;
+  std::vector<std::unique_ptr<Provider>> providers_;
+  // A create function may call up into the broker, which may need another provider.
+  std::recursive_mutex mutex_;
+  std::unordered_map<std::string, std::unique_ptr<Library>> libraries_;
+};
+
+}  // namespace zorva::broker

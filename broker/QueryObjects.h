@@ -1,0 +1,39 @@
+#pragma once
+
+#include "cmpidt.h"
+#include "cmpift.h"
+
+// Query expressions. This broker runs no queries and delivers no indications, so it never makes such an object; one of
+// each kind exists so that their function tables do: every function of them answers CMPI_RC_ERR_NOT_SUPPORTED, save that
+// releasing one is harmless.
+
+namespace zorva::broker {
+
+struct SelectExpObject : CMPISelectExp {
+  using Handle = CMPISelectExp;
+  static CMPISelectExpFT table;
+};
+
+struct SelectCondObject : CMPISelectCond {
+  using Handle = CMPISelectCond;
+  static CMPISelectCondFT table;
+};
+
+struct SubCondObject : CMPISubCond {
+  using Handle = CMPISubCond;
+  static CMPISubCondFT table;
+};
+
+struct PredicateObject : CMPIPredicate {
+  using Handle = CMPIPredicate;
+  static CMPIPredicateFT table;
+};
+
+/// The one object of a kind. It is never changed.
+template <class Object>
+Object& theOnly() noexcept {
+  static Object object{{&object, &Object::table}};
+  return object;
+}
+
+}  // namespace zorva::broker

@@ -1,0 +1,98 @@
+#pragma once
+
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "broker/BrokerCore.h"
+#include "broker/Convert.h"
+#include "broker/Objects.h"
+#include "broker/Result.h"
+#include "broker/Scope.h"
+
+// One request, of a client or of a provider that calls up: which providers are asked, what they are handed, and what of
+// their answers goes on. It opens a scope on its thread that ends with it.
+
+namespace zorva::broker {
+
+/// What of each instance is wanted, as Selection in Broker.h, with the names as they came.
+struct Shape {
+  bool localOnly = false;
+  bool deepInheritance = true;
+  std::optional<std::vector<std::string_view>> properties;
+};
+
+/// As AssociationFilter in Broker.h.
+struct FarEnd {
+  std::string_view associationClass;
+  std::string_view resultClass;
+  std::string_view role;
+  std::string_view resultRole;
+};
+
+/// Instances or names: the two forms of most read operations.
+enum class Form { Instances, Paths };
+
+/// A receiver that takes instances with the mask of the properties that are wanted of them.
+class Taker {
+ public:
+  virtual ~Taker() = default;
+  virtual bool takeInstance(const InstanceObject& instance, const PropertyMask& wanted) = 0;
+  virtual bool takePath(const PathObject& path) = 0;
+};
+
+class Request {
+ public:
+  explicit Request(BrokerCore& core);
+  Request(const Request&) = delete;
+  Request& operator=(const Request&) = delete;
+
+  Scope& scope() noexcept { return scope_; }
+  Arena& arena() noexcept { return scope_.arena(); }
+  /// What the providers are given; empty at first.
+  ContextObject& context() noexcept { return context_; }
+
+  // The operations. `path` lives in this request's arena or outlives it; its namespace may be in any spelling, and empty
+  // for the default. Statuses as Broker.h tells.
+  Status enumerate(const PathObject& path, Form form, const Shape& shape, Taker& taker);
+  Status get(const PathObject& path, const Shape& shape, Taker& taker);
+  Status create(const PathObject& path, const InstanceObject& instance, Taker& taker);
+  Status modify(const PathObject& path, const InstanceObject& instance, const Shape& shape);
+  Status remove(const PathObject& path);
+  Status associated(const PathObject& path, Form form, const FarEnd& filter, const Shape& shape, Taker& taker);
+  Status referring(const PathObject& path, Form form, const FarEnd& filter, const Shape& shape, Taker& taker);
+  Status invoke(const PathObject& path, std::string_view method, const EntryList& input, CMPIData& value,
+                EntryList& output);
+
+  /// `path` with the class `info` and the namespace as the registry spells it; a failure where either is unknown.
+  Status resolve(const PathObject& path, PathObject*& resolved);
+
+ private:
+  struct Association;
+  class Filter;
+
+  Status tooDeep() const;
+  const ProviderEntry* entryOf(const PathObject& path, const ClassInfo& info, MiKind kind) const;
+  std::vector<const ClassInfo*> servedBelow(const PathObject& path, const ClassInfo& info) const;
+  Status findAssociations(const PathObject& path, const FarEnd& filter, bool farEndMatters,
+                          std::vector<Association>& found, const ClassInfo*& resultClass) const;
+  const char** providerList(const Shape& shape, const std::vector<const ClassInfo*>& classes);
+
+  /// Calls a slot of a provider's table, null where the provider lacks it. What it throws becomes a failure.
+  template <class Function, class... Args>
+  Status call(ResultObject& result, const ProviderEntry& entry, std::string_view operation, Function function,
+              Args... args);
+  template <class Ask>
+  Status askEach(const std::vector<Association>& associations, const Filter& results, Ask&& ask);
+  Status enumerateOne(const PathObject& path, const ClassInfo& info, Form form, const Shape& shape, Filter& filter,
+                      bool& unavailable);
+  Status findInstanceMi(const PathObject& path, std::string_view operation, PathObject*& resolved,
+                        const ProviderEntry*& entry, const CMPIInstanceMI*& mi);
+
+  BrokerCore& core_;
+  Scope scope_;
+  ContextObject& context_;
+};
+
+}  // namespace zorva::broker

@@ -1,0 +1,272 @@
+#include "factory/DNSClientObjFactory.h"
+
+#include <Locale.h>
+#include <PlatformUtilities.h>
+#include <StringConversion.h>
+#include <strings.h>
+
+#include "factory/CmpiSupport.h"
+#include "trace/Trace.h"
+
+namespace ZV {
+
+const std::string loggerDNSObjFactory = "Zorvagent.DNSObjFactory";
+static const char* const computerSystemClass = "ZORVA_ComputerSystem";
+static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
+static const char* const remoteServiceAccessPointClass = "ZORVA_RemoteServiceAccessPoint";
+
+namespace {
+
+constexpr unsigned long kDNSResourceLibrary = 2;
+
+std::string localised(const wchar_t* key) {
+  return make_string(ResourceString(Locale::getResourceLibrary(kDNSResourceLibrary, Locale::getLanguageId()), key));
+}
+
+// The host's own endpoints stand on the system that is named; those of the service processor on a name that is fixed.
+std::string systemNameFor(const DNSClient& client) {
+  return strcasecmp(client.getDNSSCCN().c_str(), computerSystemClass) == 0 ? getSystemName() : "BMC:-1";
+}
+
+const std::vector<const char*> kSystemKeys = {"SystemCreationClassName", "CreationClassName", "SystemName", "Name"};
+
+}  // namespace
+
+// What a failed read of the endpoints left in the map is used as it stands.
+DNSClientObjFactory::DNSClientObjFactory() {
+  if (getDNSClientInstances(dnsClientMap) == 0) getDNSServerInstances(dnsServerMap);
+}
+
+unsigned short DNSClientObjFactory::getAllDNSClientCMPIObjPaths(const CMPIBroker* broker, const CMPIObjectPath* ref,
+                                                                std::vector<CMPIObjectPath*>& objectPaths,
+                                                                CMPIStatus* status) {
+  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " objectPaths=", &objectPaths,
+           " status=", status);
+  if (dnsClientMap.empty()) {
+    logError(loggerDNSObjFactory, ZV_HERE, "No ObjectPath Found");
+    return 1;
+  }
+  const std::string nameSpace = nameSpaceOf(ref, status);
+  for (const auto& [name, client] : dnsClientMap) {
+    CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsProtocolEndPointClass, status);
+    if (!isGood(path)) {
+      logError(loggerDNSObjFactory, ZV_HERE, "Create CMPIObjectPath                     failed for DNSClientClass.");
+      return 2;
+    }
+    addTextKey(path, "SystemCreationClassName", client.getDNSSCCN());
+    addTextKey(path, "CreationClassName", dnsProtocolEndPointClass);
+    addTextKey(path, "SystemName", systemNameFor(client));
+    addTextKey(path, "Name", client.getDNSClientName());
+    objectPaths.push_back(path);
+  }
+  return 0;  // unlike its siblings this function marks no exit
+}
+
+namespace {
+
+// False where the broker makes no array.
+bool setSuffixes(const CMPIBroker* broker, const CMPIInstance* instance, const std::vector<std::string>& suffixes,
+                 const LogSite& site, CMPIStatus* rc) {
+  const unsigned short dnsSuffixesSize = count16(suffixes);
+  CMPIArray* array = newArray(broker, dnsSuffixesSize, CMPI_string, rc);
+  if (array == nullptr) {
+    logError(loggerDNSObjFactory, site, "Create Array for Property DNSSuffixesToAppend failed.");
+    return false;
+  }
+  logVariable(loggerDNSObjFactory, site, "dnsSuffixesSize", dnsSuffixesSize);
+  for (unsigned short i = 0; i < dnsSuffixesSize; ++i) {
+    CMPIString* suffix = newString(broker, suffixes[i], rc);
+    if (suffix != nullptr) *rc = setTextElement(array, i, suffix);
+  }
+  setArray(instance, "DNSSuffixesToAppend", array, CMPI_stringA);
+  return true;
+}
+
+}  // namespace
+
+CMPIInstance* DNSClientObjFactory::makeDNSClientInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
+                                                         DNSClient dc, const char** properties, bool isObjPath,
+                                                         CMPIStatus* rc) {
+  const auto markExit = [&] {
+    logExit(loggerDNSObjFactory, ZV_HERE_IN("makeDNSClientInstance"), " broker=", broker, " ref=", ref, " dc=", &dc,
+            " properties=", properties, " isObjPath=", isObjPath, " rc=", rc);
+  };
+  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " dc=", &dc, " properties=", properties,
+           " isObjPath=", isObjPath, " rc=", rc);
+  const WantedProperties wanted(properties, isObjPath);
+
+  CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, rc), dnsProtocolEndPointClass, nullptr);
+  if (!isGood(path)) {
+    markExit();
+    return nullptr;
+  }
+  CMPIInstance* instance = newInstance(broker, path, nullptr);
+  if (!isGood(instance)) {
+    markExit();
+    return instance;
+  }
+  if (!isObjPath) setPropertyFilter(instance, properties, kSystemKeys);
+
+  setText(instance, "SystemCreationClassName", dc.getDNSSCCN());
+  setText(instance, "CreationClassName", dnsProtocolEndPointClass);
+  setText(instance, "SystemName", systemNameFor(dc));
+  setText(instance, "Name", dc.getDNSClientName());
+  if (wanted("Caption")) setText(instance, "Caption", localised(L"MSGID_DNS_CLIENT_CAPTION"));
+  if (wanted("Description")) setText(instance, "Description", localised(L"MSGID_DNS_CLIENT_DESCRIPTION"));
+  if (wanted("ProtocolIFType")) setUint16(instance, "ProtocolIFType", dc.getprotocolIFType());
+  if (wanted("ElementName")) setText(instance, "ElementName", dc.getElementName());
+  if (wanted("Hostname")) setText(instance, "Hostname", dc.getHostName());
+  if (wanted("NameFormat")) setText(instance, "NameFormat", dc.getNameFormat());
+  if (wanted("OtherTypeDescription")) setText(instance, "OtherTypeDescription", dc.getOtherTypeDescription());
+  if (wanted("DomainName")) setText(instance, "DomainName", dc.getDomainName());
+  if (wanted("DNSSuffixesToAppend")) {
+    if (!setSuffixes(broker, instance, dc.getDNSSuffixesToAppend(), ZV_HERE, rc)) return instance;
+  }
+  if (wanted("EnabledState")) setUint16(instance, "EnabledState", dc.getEnabledState());
+  if (wanted("RequestedState")) setUint16(instance, "RequestedState", dc.getRequestedState());
+  markExit();
+  return instance;
+}
+
+unsigned short DNSClientObjFactory::getOneDNSClientCMPIInstance(const CMPIBroker* broker,
+                                                                const CMPIObjectPath* objectPath, CMPIString* key,
+                                                                const char** properties,
+                                                                std::vector<CMPIInstance*>& instances,
+                                                                CMPIStatus* status) {
+  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " objectPath=", objectPath, " key=", key,
+           " properties=", properties, " instances=", &instances, " status=", status);
+  const auto found = dnsClientMap.find(textOf(key, status));
+  if (found == dnsClientMap.end()) {
+    logError(loggerDNSObjFactory, ZV_HERE, "No DNSClient instance found in the Map");
+    return 1;
+  }
+  instances.push_back(makeDNSClientInstance(broker, objectPath, found->second, properties, false, status));
+  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " objectPath=", objectPath, " key=", key,
+          " properties=", properties, " instances=", &instances, " status=", status);
+  return 0;
+}
+
+unsigned short DNSClientObjFactory::getAllDNSClientCMPIInstances(const CMPIBroker* broker, const CMPIObjectPath* ref,
+                                                                 const char** properties, bool isObjPath,
+                                                                 std::vector<CMPIInstance*>& instances,
+                                                                 CMPIStatus* rc) {
+  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
+           " isObjPath=", isObjPath, " instances=", &instances, " rc=", rc);
+  unsigned short failed = 0;
+  if (dnsClientMap.empty()) {
+    logError(loggerDNSObjFactory, ZV_HERE, "***No instance found***");
+    failed = 1;
+  }
+  for (const auto& [name, client] : dnsClientMap) {
+    instances.push_back(makeDNSClientInstance(broker, ref, client, properties, isObjPath, rc));
+  }
+  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
+          " isObjPath=", isObjPath, " instances=", &instances, " rc=", rc);
+  return failed;
+}
+
+unsigned short DNSClientObjFactory::getAllDNSServerCMPIObjPaths(const CMPIBroker* broker, const CMPIObjectPath* ref,
+                                                                std::vector<CMPIObjectPath*>& objectPaths,
+                                                                CMPIStatus* status) {
+  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " objectPaths=", &objectPaths,
+           " status=", status);
+  if (dnsServerMap.empty()) {
+    logError(loggerDNSObjFactory, ZV_HERE, "No ObjectPath found");
+    return 1;
+  }
+  const std::string nameSpace = nameSpaceOf(ref, status);
+  for (const auto& [address, server] : dnsServerMap) {
+    CMPIObjectPath* path = newHostPath(broker, nameSpace, remoteServiceAccessPointClass, status);
+    if (!isGood(path)) {
+      logError(loggerDNSObjFactory, ZV_HERE, "Create CMPIObjectPath                     failed for DNSServerClass.");
+      return 2;
+    }
+    addTextKey(path, "SystemCreationClassName", computerSystemClass);
+    addTextKey(path, "CreationClassName", remoteServiceAccessPointClass);
+    addTextKey(path, "SystemName", getSystemName());
+    addTextKey(path, "Name", server.getAccessInfo());
+    objectPaths.push_back(path);
+  }
+  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " objectPaths=", &objectPaths,
+          " status=", status);
+  return 0;
+}
+
+CMPIInstance* DNSClientObjFactory::makeDNSServerInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
+                                                         DNSServer ds, const char** properties, bool isObjPath,
+                                                         CMPIStatus* rc) {
+  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " ds=", &ds, " properties=", properties,
+           " isObjPath=", isObjPath, " rc=", rc);
+  const WantedProperties wanted(properties, isObjPath);
+
+  CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, rc), remoteServiceAccessPointClass, nullptr);
+  if (!isGood(path)) return nullptr;
+  CMPIInstance* instance = newInstance(broker, path, nullptr);
+  if (!isGood(instance)) return instance;
+  if (!isObjPath) setPropertyFilter(instance, properties, kSystemKeys);
+
+  setText(instance, "SystemCreationClassName", computerSystemClass);
+  setText(instance, "CreationClassName", remoteServiceAccessPointClass);
+  setText(instance, "SystemName", getSystemName());
+  setText(instance, "Name", ds.getAccessInfo());
+  if (wanted("Caption")) setText(instance, "Caption", localised(L"MSGID_DNS_SERVER_CAPTION"));
+  if (wanted("Description")) setText(instance, "Description", localised(L"MSGID_DNS_SERVER_DESCRIPTION"));
+  if (wanted("NameFormat")) setText(instance, "NameFormat", ds.getNameFormat());
+  if (wanted("AccessContext")) setUint16(instance, "AccessContext", ds.getAccessContext());
+  if (wanted("AccessInfo")) setText(instance, "AccessInfo", ds.getAccessInfo());
+  if (wanted("InfoFormat")) setUint16(instance, "InfoFormat", ds.getInfoFormat());
+  if (wanted("OrderOfAccess")) setUint16(instance, "OrderOfAccess", ds.getOrderOfAccess());
+  if (wanted("ElementName")) setText(instance, "ElementName", ds.getElementName());
+  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " ds=", &ds, " properties=", properties,
+          " isObjPath=", isObjPath, " rc=", rc);
+  return instance;
+}
+
+unsigned short DNSClientObjFactory::getOneDNSServerCMPIInstance(const CMPIBroker* broker,
+                                                                const CMPIObjectPath* objectPath, CMPIString* key,
+                                                                const char** properties,
+                                                                std::vector<CMPIInstance*>& instances,
+                                                                CMPIStatus* status) {
+  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " objectPath=", objectPath, " key=", key,
+           " properties=", properties, " instances=", &instances, " status=", status);
+  const auto found = dnsServerMap.find(textOf(key, status));
+  if (found == dnsServerMap.end()) {
+    logError(loggerDNSObjFactory, ZV_HERE, "No DNS Server instance found in the map");
+    return 1;
+  }
+  instances.push_back(makeDNSServerInstance(broker, objectPath, found->second, properties, false, status));
+  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " objectPath=", objectPath, " key=", key,
+          " properties=", properties, " instances=", &instances, " status=", status);
+  return 0;
+}
+
+unsigned short DNSClientObjFactory::getAllDNSServerCMPIInstances(const CMPIBroker* broker, const CMPIObjectPath* ref,
+                                                                 const char** properties, bool isObjPath,
+                                                                 std::vector<CMPIInstance*>& instances,
+                                                                 CMPIStatus* rc) {
+  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
+           " isObjPath=", isObjPath, " instances=", &instances, " rc=", rc);
+  if (dnsServerMap.empty()) {
+    logError(loggerDNSObjFactory, ZV_HERE, "***No instance found***");
+    return 1;  // unlike the endpoints' sibling without marking the exit
+  }
+  for (const auto& [address, server] : dnsServerMap) {
+    instances.push_back(makeDNSServerInstance(broker, ref, server, properties, isObjPath, rc));
+  }
+  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
+          " isObjPath=", isObjPath, " instances=", &instances, " rc=", rc);
+  return 0;
+}
+
+unsigned short DNSClientObjFactory::getOrderOfAccess(const CMPIBroker* _broker, CMPIObjectPath* dnsServer,
+                                                     CMPIStatus* rc) {
+  logEntry(loggerDNSObjFactory, ZV_HERE, " _broker=", _broker, " dnsServer=", dnsServer, " rc=", rc);
+  const std::string serverName = keyText(dnsServer, "Name", rc);
+  logVariable(loggerDNSObjFactory, ZV_HERE, "serverName", serverName);
+  const auto found = dnsServerMap.find(serverName);
+  if (found != dnsServerMap.end()) return found->second.getOrderOfAccess();
+  logExit(loggerDNSObjFactory, ZV_HERE, " _broker=", _broker, " dnsServer=", dnsServer, " rc=", rc);
+  return 1;  // as for the first server: the caller cannot tell a miss from a hit
+}
+
+}  // namespace ZV

@@ -1,0 +1,125 @@
+#include "factory/DNSGeneralSettingDataObjects.h"
+
+#include <PlatformUtilities.h>
+
+#include "factory/CmpiSupport.h"
+#include "factory/DNSClientObjFactory.h"
+#include "factory/SettingProperties.h"
+#include "trace/Trace.h"
+
+namespace ZV {
+
+static const char* const dnsGeneralSettingDataClass = "ZORVA_DNSGeneralSettingData";
+
+namespace {
+
+std::string generalInstanceID() { return "dnsgen1:" + getSystemName(); }
+
+// False where the broker makes no array.
+bool setSuffixes(const CMPIBroker* broker, const CMPIInstance* instance, const std::vector<std::string>& suffixes,
+                 const LogSite& site, CMPIStatus* status) {
+  const unsigned short count = count16(suffixes);
+  CMPIArray* array = newArray(broker, count, CMPI_string, status);
+  if (array == nullptr) {
+    logError(loggerDNSObjFactory, site, "Create Array for Property DNSSuffixesToAppend failed.");
+    return false;
+  }
+  for (unsigned short i = 0; i < count; ++i) {
+    logVariable(loggerDNSObjFactory, site, "dnsSuf", suffixes[i]);
+    CMPIString* suffix = newString(broker, suffixes[i], status);
+    if (suffix != nullptr) setTextElement(array, i, suffix);
+  }
+  setArray(instance, "DNSSuffixesToAppend", array, CMPI_stringA);
+  return true;
+}
+
+void addInstance(const CMPIBroker* broker, const CMPIObjectPath* ref, const char** properties,
+                 std::vector<CMPIInstance*>* instances, CMPIStatus* status) {
+  DNSGeneralSettingData data;
+  if (data) {
+    instances->push_back(makeDNSGeneralSettingDataInstance(broker, ref, data, properties, false, status));
+  }
+}
+
+}  // namespace
+
+unsigned short getAllDNSGeneralSettingDataCMPIObjectPaths(const CMPIBroker* broker, const CMPIObjectPath* ref,
+                                                          std::vector<CMPIObjectPath*>* paths, CMPIStatus* status) {
+  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " paths=", paths, " status=", status);
+  unsigned short failed = 0;
+  DNSGeneralSettingData data;
+  if (data) {
+    CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, status), dnsGeneralSettingDataClass, nullptr);
+    if (isGood(path)) {
+      addTextKey(path, "InstanceID", generalInstanceID());
+      paths->push_back(path);
+    } else {
+      logError(loggerDNSObjFactory, ZV_HERE, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
+      failed = 1;
+    }
+  }
+  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " paths=", paths, " status=", status);
+  return failed;
+}
+
+CMPIInstance* makeDNSGeneralSettingDataInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
+                                                DNSGeneralSettingData data, const char** properties, bool isObjPath,
+                                                CMPIStatus* status) {
+  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " data=", &data, " properties=", properties,
+           " isObjPath=", isObjPath, " status=", status);
+  const WantedProperties wanted(properties, isObjPath);
+
+  CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, status), dnsGeneralSettingDataClass, nullptr);
+  if (!isGood(path)) return nullptr;
+  CMPIInstance* instance = newInstance(broker, path, nullptr);
+  if (!isGood(instance)) return instance;
+  if (!isObjPath) setPropertyFilter(instance, properties, {"InstanceID"});
+
+  setText(instance, "InstanceID", generalInstanceID());
+  setTextIfWanted(instance, wanted, "Caption", data, &DNSGeneralSettingData::getCaption);
+  setTextIfWanted(instance, wanted, "Description", data, &DNSGeneralSettingData::getDescription);
+  setTextIfWanted(instance, wanted, "ElementName", data, &DNSGeneralSettingData::getElementName);
+  if (wanted("ConfigurationName")) {
+    std::string configurationName;
+    data.getConfigurationName(configurationName);  // without a file the empty text is set
+    setText(instance, "ConfigurationName", configurationName);
+  }
+  setUint16IfWanted(instance, wanted, "AddressOrigin", data, &DNSGeneralSettingData::getAddressOrigin);
+  setBooleanIfWanted(instance, wanted, "AppendPrimarySuffixes", data, &DNSGeneralSettingData::getAppendPrimarySuffixes);
+  setBooleanIfWanted(instance, wanted, "AppendParentSuffixes", data, &DNSGeneralSettingData::getAppendParentSuffixes);
+  if (wanted("DNSSuffixesToAppend")) {
+    std::vector<std::string> suffixes;
+    if (data.getDNSSuffixesToAppend(suffixes) && !suffixes.empty() &&
+        !setSuffixes(broker, instance, suffixes, ZV_HERE, status)) {
+      return instance;
+    }
+  }
+  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " data=", &data, " properties=", properties,
+          " isObjPath=", isObjPath, " status=", status);
+  return instance;
+}
+
+unsigned short getOneDNSGeneralSettingDataCMPIInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
+                                                       const char** properties, std::vector<CMPIInstance*>* instances,
+                                                       CMPIStatus* status) {
+  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
+           " instances=", instances, " status=", status);
+  keyText(ref, "InstanceID", status);  // read and compared with nothing: there is but one instance
+  addInstance(broker, ref, properties, instances, status);
+  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
+          " instances=", instances, " status=", status);
+  return 0;
+}
+
+unsigned short getAllDNSGeneralSettingDataCMPIInstances(const CMPIBroker* broker, const CMPIObjectPath* ref,
+                                                        const char** properties, std::vector<CMPIInstance*>* instances,
+                                                        CMPIStatus* status) {
+  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
+           " instances=", instances, " status=", status);
+  addInstance(broker, ref, properties, instances, status);
+  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
+          " instances=", instances, " status=", status);
+  return 0;
+}
+
+}  // namespace ZV

@@ -1,0 +1,98 @@
+// The frame that all twelve providers share: function tables, create functions, and the operations that do no work.
+//
+// A provider's source includes this header once, defines its operations in namespace ZV as <Stem>_<Operation>, and
+// closes with the MI macros for the kinds that it serves. Each source has its own broker and its own tables.
+#pragma once
+
+#include <cmpidt.h>
+#include <cmpift.h>
+
+#include <string>
+#include <vector>
+
+#include "factory/CmpiSupport.h"
+#include "trace/Trace.h"
+
+#define ZV_PROVIDER_EXPORT extern "C" __attribute__((visibility("default")))
+
+// The version of the function tables, as all CMPI 2.x servers take it.
+#define ZV_TABLE_VERSION 200
+
+namespace ZV {
+
+// Written by the source's create functions, the latest call winning, and read by its operations.
+static const CMPIBroker* broker = nullptr;
+
+constexpr CMPIStatus kNotSupported = {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
+
+}  // namespace ZV
+
+// What no provider does: nothing is held across calls, so there is nothing to clean up, and no object can be made or
+// deleted by a client.
+#define ZV_REFUSED_INSTANCE_OPERATIONS(stem)                                                                        \
+  static CMPIStatus stem##_Cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) { return kStatusOk; }          \
+  static CMPIStatus stem##_CreateInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,                   \
+                                          const CMPIObjectPath*, const CMPIInstance*) {                             \
+    return kNotSupported;                                                                                           \
+  }                                                                                                                 \
+  static CMPIStatus stem##_DeleteInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,                   \
+                                          const CMPIObjectPath*) {                                                  \
+    return kNotSupported;                                                                                           \
+  }                                                                                                                 \
+  static CMPIStatus stem##_ExecQuery(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*, \
+                                     const char*, const char*) {                                                    \
+    return kNotSupported;                                                                                           \
+  }
+
+// For the nine providers whose instances cannot be changed.
+#define ZV_REFUSED_MODIFICATION(stem)                                                                 \
+  static CMPIStatus stem##_ModifyInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,     \
+                                          const CMPIObjectPath*, const CMPIInstance*, const char**) { \
+    return kNotSupported;                                                                             \
+  }
+
+#define ZV_ASSOCIATION_CLEANUP(stem) \
+  static CMPIStatus stem##_AssociationCleanup(CMPIAssociationMI*, const CMPIContext*, CMPIBoolean) { return kStatusOk; }
+
+// The table of a provider's instance operations and the create function that hands it out.
+#define ZV_INSTANCE_MI(prefix, stem)                                                                          \
+  namespace ZV {                                                                                              \
+  static CMPIInstanceMIFT instMIFT__ = {                                                                      \
+      ZV_TABLE_VERSION,         ZV_TABLE_VERSION,      "instance" #prefix, stem##_Cleanup,                    \
+      stem##_EnumInstanceNames, stem##_EnumInstances,  stem##_GetInstance, stem##_CreateInstance,             \
+      stem##_ModifyInstance,    stem##_DeleteInstance, stem##_ExecQuery,                                      \
+  };                                                                                                          \
+  }                                                                                                           \
+  ZV_PROVIDER_EXPORT CMPIInstanceMI* prefix##_Create_InstanceMI(const CMPIBroker* broker, const CMPIContext*, \
+                                                                CMPIStatus*) {                                \
+    static CMPIInstanceMI mi = {nullptr, &ZV::instMIFT__};                                                    \
+    ZV::broker = broker;                                                                                      \
+    return &mi;                                                                                               \
+  }
+
+#define ZV_ASSOCIATION_MI(prefix, stem)                                                                             \
+  namespace ZV {                                                                                                    \
+  static CMPIAssociationMIFT assocMIFT__ = {                                                                        \
+      ZV_TABLE_VERSION,   ZV_TABLE_VERSION,       "association" #prefix, stem##_AssociationCleanup,                 \
+      stem##_Associators, stem##_AssociatorNames, stem##_References,     stem##_ReferenceNames,                     \
+  };                                                                                                                \
+  }                                                                                                                 \
+  ZV_PROVIDER_EXPORT CMPIAssociationMI* prefix##_Create_AssociationMI(const CMPIBroker* broker, const CMPIContext*, \
+                                                                      CMPIStatus*) {                                \
+    static CMPIAssociationMI mi = {nullptr, &ZV::assocMIFT__};                                                      \
+    ZV::broker = broker;                                                                                            \
+    return &mi;                                                                                                     \
+  }
+
+#define ZV_METHOD_MI(prefix, stem)                                                                        \
+  namespace ZV {                                                                                          \
+  static CMPIMethodMIFT methMIFT__ = {                                                                    \
+      ZV_TABLE_VERSION, ZV_TABLE_VERSION, "method" #prefix, stem##_MethodCleanup, stem##_InvokeMethod,    \
+  };                                                                                                      \
+  }                                                                                                       \
+  ZV_PROVIDER_EXPORT CMPIMethodMI* prefix##_Create_MethodMI(const CMPIBroker* broker, const CMPIContext*, \
+                                                            CMPIStatus*) {                                \
+    static CMPIMethodMI mi = {nullptr, &ZV::methMIFT__};                                                  \
+    ZV::broker = broker;                                                                                  \
+    return &mi;                                                                                           \
+  }

@@ -1,0 +1,119 @@
+#include "settings/DNSSettingData.h"
+
+#include "model/OwningSystem.h"
+#include "settings/InterfaceFile.h"
+#include "trace/Trace.h"
+
+namespace ZV {
+
+const std::string loggerDNSSettingData = "Zorvagent.DNSSettingDataProvider";
+
+DNSSettingData::DNSSettingData() { selectNode(NodeLexicon::NODE_NETWORK_IP_CONFIG); }
+
+DNSSettingData::operator bool() {
+  if (!Instrumentation::operator bool()) return false;
+  std::string name;
+  if (getProperty(NodeLexicon::PROP_NAME, name)) fileName = interfaceFileName(name);
+  logVariable(loggerDNSSettingData, ZV_HERE, "fileName", fileName);
+  return true;
+}
+
+DNSSettingData& DNSSettingData::operator++() {
+  Instrumentation::operator++();
+  return *this;
+}
+
+bool DNSSettingData::getInstanceID(std::string& value) const {
+  std::string name;
+  if (!getProperty(NodeLexicon::PROP_NAME, name)) return false;
+  value = (owningSystemDescription(*this) == kServiceProcessorDescription ? "BMC%" : "Computer%") + name;
+  return true;
+}
+
+bool DNSSettingData::getElementName(std::string& value) const {
+  std::string name;
+  if (!getProperty(NodeLexicon::PROP_NAME, name)) return false;
+  value = "DNSSettingData." + name;
+  return true;
+}
+
+bool DNSSettingData::getCaption(std::string& value) const {
+  value = "DNS Setting Configuration";
+  return true;
+}
+
+bool DNSSettingData::getDescription(std::string& value) const {
+  value = "Represents DNS Setting Configuration for DNS Protocol EndPoint";
+  return true;
+}
+
+// No link to the boot protocol.
+bool DNSSettingData::getAddressOrigin(unsigned short& value) const {
+  value = 2;
+  return true;
+}
+
+namespace {
+
+void readLoggedScalar(const std::string& fileName, const char* key, const LogSite& site, const char* name,
+                      std::string& value) {
+  value = readScalar(fileName, key);
+  logVariable(loggerDNSSettingData, site, name, value);
+}
+
+}  // namespace
+
+bool DNSSettingData::getBootProtocol(std::string& value) const {
+  if (!interfaceFileExists(fileName)) return false;
+  readLoggedScalar(fileName, "BOOTPROTO", ZV_HERE, "bootProtocol", value);
+  return true;
+}
+
+bool DNSSettingData::getDomainName(std::string& value) const {
+  if (!interfaceFileExists(fileName)) return getProperty(NodeLexicon::PROP_DOMAIN_NAME, value);
+  readLoggedScalar(fileName, "DOMAINNAME", ZV_HERE, "domainName", value);
+  return true;
+}
+
+bool DNSSettingData::getRequestedHostname(std::string& value) const {
+  if (!interfaceFileExists(fileName)) return getProperty(NodeLexicon::PROP_HOST_NAME, value);
+  readLoggedScalar(fileName, "HOSTNAME", ZV_HERE, "requestedHostname", value);
+  return true;
+}
+
+bool DNSSettingData::getConfigurationName(std::string& value) const {
+  if (!interfaceFileExists(fileName)) return false;
+  readLoggedScalar(fileName, "CONFIG_NAME", ZV_HERE, "configurationName", value);
+  return true;
+}
+
+bool DNSSettingData::getDNSServerAddresses(std::vector<std::string>& values) const {
+  if (!interfaceFileExists(fileName)) return getProperty(NodeLexicon::PROP_DNS_SERVER_ADDRESSES, values);
+  readList(fileName, "DNSSERVERS", values);
+  return true;
+}
+
+bool DNSSettingData::getDHCPOptionsToUse(std::vector<unsigned short>& values) const {
+  values.insert(values.end(), {8, 14, 17});  // Domain Name Servers, Host Name and Domain Name
+  return true;
+}
+
+bool DNSSettingData::getUseSuffixWhenRegistering(bool&) const { return true; }
+
+bool DNSSettingData::getRegisterThisConnectionsAddress(bool&) const { return false; }
+
+bool DNSSettingData::setRequestedHostname(std::string value) { return setProperty(NodeLexicon::PROP_HOST_NAME, value); }
+
+bool DNSSettingData::setDomainName(std::string value) { return setProperty(NodeLexicon::PROP_DOMAIN_NAME, value); }
+
+bool DNSSettingData::setDNSServerAddresses(std::vector<std::string> values) {
+  return setProperty(NodeLexicon::PROP_DNS_SERVER_ADDRESSES, std::vector<std::string>(values));
+}
+
+bool DNSSettingData::setConfigurationName(const std::string& value) {
+  logVariable(loggerDNSSettingData, ZV_HERE, "fileName", fileName);
+  modifyValue(fileName, "CONFIG_NAME", value);
+  return true;
+}
+
+}  // namespace ZV

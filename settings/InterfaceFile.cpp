@@ -1,0 +1,104 @@
+#include "settings/InterfaceFile.h"
+
+#include <File.h>
+#include <PlatformUtilities.h>
+#include <PropertyFile.h>
+#include <StringConversion.h>
+
+#include <cstdio>
+#include <cstring>
+#include <filesystem>
+#include <memory>
+#include <system_error>
+
+#include "trace/Trace.h"
+
+namespace ZV {
+
+std::string interfaceFileName(const std::string& interfaceName) {
+  return std::string(PlatformUtilities::getMaroviaDataDir()) + "ifcfg-" + interfaceName;
+}
+
+bool interfaceFileExists(const std::string& fileName) { return File::exists(make_wstring(fileName)); }
+
+namespace {
+
+// A reader that did not open has no keys, so its value is the empty text too.
+std::string readValue(const std::string& fileName, const char* key) {
+  PropertyFile file{File::Path(fileName)};
+  file.open(1);
+  std::string value = make_string(file.getValue(make_wstring(key)));
+  file.close();
+  return value;
+}
+
+}  // namespace
+
+std::string readScalar(const std::string& fileName, const char* key) {
+  std::string value = readValue(fileName, key);
+  const std::size_t last = value.find_last_not_of('\n');
+  if (last != std::string::npos) value.erase(last + 1);
+  return value;
+}
+
+void readList(const std::string& fileName, const char* key, std::vector<std::string>& values) {
+  const std::string value = readValue(fileName, key);
+  std::size_t start = value.find_first_not_of(' ');
+  while (start != std::string::npos) {
+    const std::size_t end = value.find(' ', start);
+    values.push_back(value.substr(start, end - start));
+    start = value.find_first_not_of(' ', end);
+  }
+}
+
+namespace {
+
+struct CloseFile {
+  void operator()(std::FILE* file) const { std::fclose(file); }
+};
+using Stream = std::unique_ptr<std::FILE, CloseFile>;
+
+// Opening anything but a regular file could block.
+bool isRegularFile(const std::string& fileName) {
+  std::error_code error;
+  return std::filesystem::is_regular_file(fileName, error);
+}
+
+std::string lineOf(const std::string& key, const std::string& value) {
+  return std::string(key.c_str()) + "=" + value.c_str() + "\n";  // each ends at its first NUL
+}
+
+// Replaces every line that holds the key; what appendAbsent is for, see modifyValue.
+void rewrite(const std::string& fileName, const std::string& key, const std::string& value, bool appendAbsent) {
+  if (!isRegularFile(fileName)) return;
+  Stream in(std::fopen(fileName.c_str(), "r"));
+  if (!in) return;
+  std::vector<std::string> pieces;
+  bool matched = false;
+  char buffer[512];
+  while (std::fgets(buffer, sizeof buffer, in.get()) != nullptr) {
+    const bool matches = std::strstr(buffer, key.c_str()) != nullptr;
+    pieces.push_back(matches ? lineOf(key, value) : std::string(buffer));
+    matched = matched || matches;
+  }
+  in.reset();
+  if (!matched && appendAbsent) pieces.push_back(lineOf(key, value));
+
+  const Stream out(std::fopen(fileName.c_str(), "w"));
+  if (!out) return;  // the old contents survive
+  for (const std::string& piece : pieces) std::fputs(piece.c_str(), out.get());
+}
+
+}  // namespace
+
+void modifyValue(std::string fileName, std::string key, std::string value) { rewrite(fileName, key, value, true); }
+
+bool modifyDNSValue(std::string fileName, std::string key, std::string value) {
+  logVariable(loggerDNSSettingData, ZV_HERE, "FileName", fileName);
+  logVariable(loggerDNSSettingData, ZV_HERE, "propertyName", key);
+  logVariable(loggerDNSSettingData, ZV_HERE, "propValue", value);
+  rewrite(fileName, key, value, false);
+  return true;
+}
+
+}  // namespace ZV

@@ -1,0 +1,14 @@
+// The order of everything that is recorded: calls to a broker and lines of the log fall into one sequence.
+#pragma once
+
+#include <atomic>
+#include <cstddef>
+
+namespace ZV::Test {
+
+inline std::size_t nextPlace() {
+  static std::atomic<std::size_t> last{0};
+  return ++last;
+}
+
+}  // namespace ZV::Test

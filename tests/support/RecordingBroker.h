@@ -1,0 +1,214 @@
+// A CMPI broker that writes down every call that is made to it and to its objects, and fails where a test asks it to.
+#pragma once
+
+#include <cmpift.h>
+
+#include <cstddef>
+#include <functional>
+#include <initializer_list>
+#include <map>
+#include <memory>
+#include <mutex>
+#include <optional>
+#include <stdexcept>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "CimValues.h"
+
+namespace ZV::Test {
+
+// How a call into the broker fails. What a call cannot do it does as near as it can: a call that only returns a status
+// fails by its rc in every mode, a count or a flag that is null is 0, a text without a handle is null.
+enum class Mode {
+  SetRc,       // rc CMPI_RC_ERR_FAILED with a message, yet the object is good
+  ReturnNull,  // rc CMPI_RC_OK, null
+  NullHandle,  // rc CMPI_RC_OK, an object whose hdl is null
+  RcAndNull,   // rc CMPI_RC_ERR_FAILED with a message, and null
+  Throw,       // an InjectedFailure flies
+};
+inline constexpr Mode kAllStatusModes[] = {Mode::SetRc, Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull};
+const char* nameOf(Mode mode);
+
+class InjectedFailure : public std::runtime_error {
+ public:
+  using std::runtime_error::runtime_error;
+};
+
+// One call: the name of the slot, and the whole of it as a line.
+struct RecordedCall {
+  std::string name;
+  std::string line;
+  std::size_t place = 0;  // among all calls and log lines of the process
+};
+
+// The calls in order, as a test compares them.
+class Calls : public std::vector<RecordedCall> {
+ public:
+  using std::vector<RecordedCall>::vector;
+
+  // All lines.
+  std::vector<std::string> lines() const;
+  // Lines of the calls that make, change or hand out something: what only reads an object or a text is left out
+  // (getKey, getCharPtr, getNameSpace, hasNext and their like).
+  std::vector<std::string> steps() const;
+  // Lines of the calls of these names.
+  std::vector<std::string> only(std::initializer_list<std::string_view> names) const;
+  // Lines of all calls but those of these names.
+  std::vector<std::string> without(std::initializer_list<std::string_view> names) const;
+  std::size_t count(std::string_view name) const;
+};
+
+// What the result that a provider was given has received.
+struct Results {
+  std::vector<Instance> instances;  // without those that were null
+  std::vector<Path> paths;          // likewise
+  std::vector<Value> data;
+  int doneCount = 0;
+  bool done() const { return doneCount != 0; }
+};
+
+// How a broker answers for a name that an object does not have.
+struct Missing {
+  CMPIrc rc;
+  CMPIValueState state;
+};
+
+// What the broker has of a class that another provider serves.
+struct ServedClass {
+  std::vector<Instance> instances;
+  CMPIrc rc = CMPI_RC_OK;        // the status of each enumeration; not OK without instances gives a null enumeration
+  bool nullEnumeration = false;  // null, whatever the rc is
+  bool throws = false;           // an InjectedFailure flies
+};
+
+struct Call;
+struct BrokerObject;
+struct PathObject;
+struct InstanceObject;
+struct StringObject;
+struct ArrayObject;
+struct EnumerationObject;
+struct ResultObject;
+struct ContextObject;
+struct ArgsObject;
+struct DateTimeObject;
+
+// Objects that the broker makes for a provider are called OP1, OP2 for object paths, and likewise I for instances, A
+// for arrays, E for enumerations, AR for arguments, C for contexts, DT for dates; a string is called by its text.
+// Objects that a test makes are called what the test calls them. The broker has no schema: an instance's path has the
+// keys that setPropertyFilter named, or else those of a small table of classes (setKeysOfClass). Names match without
+// regard to case. A null status pointer is tolerated everywhere. A handle that is null makes a call answer
+// CMPI_RC_ERR_INVALID_HANDLE and changes nothing.
+//
+// The broker owns every object and ends them all with itself, or at freeSince. Recording is safe from several threads;
+// an object belongs to one.
+class RecordingBroker {
+ public:
+  RecordingBroker();
+  ~RecordingBroker();
+  RecordingBroker(const RecordingBroker&) = delete;
+  RecordingBroker& operator=(const RecordingBroker&) = delete;
+
+  const CMPIBroker* cmpi() const { return &broker_; }
+
+  // Objects for a provider to be called with. They are not recorded as calls.
+  CMPIObjectPath* make(const Path& path, const std::string& label = "path");
+  CMPIInstance* make(const Instance& instance, const std::string& label = "instance");
+  CMPIString* makeString(const std::string& text);
+  CMPIArray* makeArray(const Value& list, const std::string& label = "array");
+  CMPIArgs* makeArgs(const std::vector<NamedValue>& arguments, const std::string& label = "args");
+  CMPIContext* makeContext(const std::string& label = "context");
+  CMPIResult* makeResult(const std::string& label = "result");
+  CMPIData makeData(const Value& value);
+
+  // What an object of any RecordingBroker holds now. Not recorded. A null object or handle gives an empty record.
+  static Path read(const CMPIObjectPath* path);
+  static Instance read(const CMPIInstance* instance);
+  static std::vector<NamedValue> read(const CMPIArgs* arguments);
+  static std::string read(const CMPIString* string);
+  static Results read(const CMPIResult* result);
+
+  // The keys of a class, in order, for getObjectPath and enumerateInstanceNames.
+  void setKeysOfClass(const std::string& className, std::vector<std::string> names);
+  const std::vector<std::string>& keysOfClass(const std::string& className) const;
+
+  // The class as another provider serves it, to be filled in by the test. A class that was never named here answers
+  // CMPI_RC_ERR_INVALID_CLASS and null.
+  ServedClass& serve(const std::string& className, std::vector<Instance> instances = {});
+
+  Missing missingKey{CMPI_RC_ERR_NOT_FOUND, CMPI_notFound};
+  Missing missingProperty{CMPI_RC_ERR_NO_SUCH_PROPERTY, CMPI_notFound};
+  Missing missingArgument{CMPI_RC_ERR_NO_SUCH_PROPERTY, CMPI_notFound};
+  CMPIValueState stateOfKeys = CMPI_goodValue;  // some servers mark a key with CMPI_keyValue
+  bool keepsLines = true;                       // false: calls are counted and not written down, for long runs
+
+  // Failures: at the n-th call from now on, counted from 1; at the next call of a slot; at each call of it.
+  void failAt(std::size_t n, Mode mode);
+  void failNext(const std::string& name, Mode mode);
+  void failEach(const std::string& name, Mode mode);
+  void failNever();
+  bool hasFailed() const;  // whether any failure was reached since startOver
+
+  Calls calls() const;            // since the last request began, or since startOver
+  std::size_t callCount() const;  // since startOver
+  std::size_t callsOf(const std::string& name) const { return calls().count(name); }
+
+  // Forgets the calls and numbers new objects from 1 again, as a request begins. Failures that were asked for stay.
+  void beginRequest();
+
+  // Forgets calls and failures and numbers new objects from 1 again; objects stay as they are.
+  void startOver();
+
+  // Ends all objects that were made after mark() gave this number.
+  std::size_t mark() const;
+  void freeSince(std::size_t mark);
+
+ private:
+  friend struct Call;
+  friend struct BrokerEncapsulation;
+  friend struct BrokerUpCalls;
+  friend struct ObjectTables;
+
+  template <typename Object>
+  Object* add(std::unique_ptr<Object> object, const char* kind, const std::string& label);
+  PathObject* addPath(Path path, const std::string& label = {});
+  InstanceObject* addInstance(Instance instance, const std::string& label = {});
+  StringObject* addString(std::string text);
+  ArrayObject* addArray(CMPIType elementType, std::vector<Value> elements, const std::string& label = {});
+  EnumerationObject* addEnumeration(std::vector<Value> elements);
+  ResultObject* addResult(const std::string& label = {});
+  ContextObject* addContext(const std::string& label = {});
+  ArgsObject* addArgs(std::vector<NamedValue> arguments, const std::string& label = {});
+  DateTimeObject* addDateTime(std::string text);
+
+  // Counts and writes down one call and says how it shall fail. Throws InjectedFailure where that is the way.
+  std::optional<Mode> record(const char* name, std::string line);
+
+  CMPIBroker broker_;
+  mutable std::mutex mutex_;
+  Calls calls_;
+  std::size_t callCount_ = 0;
+  bool hasFailed_ = false;
+  std::optional<std::pair<std::size_t, Mode>> failAt_;
+  std::map<std::string, Mode> failNext_;
+  std::map<std::string, Mode> failEach_;
+  std::map<std::string, int> numbers_;
+  std::vector<std::unique_ptr<BrokerObject>> objects_;
+  std::map<std::string, std::vector<std::string>> keysOfClass_;
+  std::map<std::string, ServedClass> served_;
+};
+
+// Runs the operation over and over, with the broker failing at its 1st call, its 2nd, and so on in each of the modes,
+// until the operation makes no call more. The operation makes its request and checks how it ended. Returns the number
+// of failures that were tried.
+std::size_t forEachFailure(RecordingBroker& broker, const std::function<void(std::size_t n, Mode mode)>& operation,
+                           std::initializer_list<Mode> modes = {Mode::SetRc, Mode::ReturnNull, Mode::NullHandle,
+                                                                Mode::RcAndNull});
+
+// What a provider made, read and described.
+std::string describe(const CMPIObjectPath* path);
+std::string describe(const CMPIInstance* instance);
+
+}  // namespace ZV::Test
