@@ -24,7 +24,8 @@ TEST(ValidateInput, EmptyLabelsAreRefused) {
 }
 
 TEST(ValidateInput, OtherCharactersAreRefused) {
-  for (const char* name : {" ", "a b", "a/b", "a\n", "a%", "m\xC3\xBCller", "a:b", "a*"}) EXPECT_FALSE(valid(name)) << name;
+  for (const char* name : {" ", "a b", "a/b", "a\n", "a%", "m\xC3\xBCller", "a:b", "a*"})
+    EXPECT_FALSE(valid(name)) << name;
   EXPECT_FALSE(valid(std::string("a\0b", 3)));
 }
 

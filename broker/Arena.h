@@ -7,8 +7,8 @@
 #include <type_traits>
 #include <utility>
 
-// The memory of one request: it is handed out by moving a pointer and given back all at once, with the arena. What lives
-// in it has no destructor.
+// The memory of one request: it is handed out by moving a pointer and given back all at once, with the arena. What
+// lives in it has no destructor.
 //
 // An arena belongs to one thread at a time. share() makes allocation safe for several, at the cost of a lock each time.
 
@@ -20,8 +20,8 @@ struct StringObject;
 
 class Arena {
  public:
-  /// `classes` is what objects in this arena ask about their class; it outlives the arena. Null only where neither a path
-  /// nor an instance will live here. The first block of memory has `firstBlock` bytes, later ones are larger.
+  /// `classes` is what objects in this arena ask about their class; it outlives the arena. Null only where neither a
+  /// path nor an instance will live here. The first block of memory has `firstBlock` bytes, later ones are larger.
   explicit Arena(const ClassTable* classes, std::size_t firstBlock = 4096) : classes_(classes), next_(firstBlock) {}
   ~Arena();
   Arena(const Arena&) = delete;
@@ -64,7 +64,8 @@ class Arena {
   /// The class of that name, or null. The last few are remembered: an operation makes many objects of few classes.
   const ClassInfo* findClass(std::string_view name);
 
-  /// A text object with that content, an earlier one where it is among the last few: namespaces, hosts and names repeat.
+  /// A text object with that content, an earlier one where it is among the last few: namespaces, hosts and names
+  /// repeat.
   StringObject* intern(std::string_view text);
 
   /// Bytes of memory held.

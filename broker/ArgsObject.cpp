@@ -52,12 +52,8 @@ CMPICount getArgCount(const CMPIArgs* handle, CMPIStatus* status) {
 }  // namespace
 
 CMPIArgsFT ArgsObject::table = {
-    kTableVersion,
-    releaseObject<ArgsObject>,
-    guarded<cloneObject<ArgsObject, copyArgs>>,
-    guarded<addArg>,
-    guarded<getArg>,
-    guarded<getArgAt>,
+    kTableVersion,        releaseObject<ArgsObject>, guarded<cloneObject<ArgsObject, copyArgs>>,
+    guarded<addArg>,      guarded<getArg>,           guarded<getArgAt>,
     guarded<getArgCount>,
 };
 

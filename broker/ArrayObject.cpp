@@ -36,7 +36,8 @@ CMPIStatus setElementAt(CMPIArray* handle, CMPICount index, const CMPIValue* val
   const CMPIrc rc = importData(*self->arena, value, type, data);
   if (rc != CMPI_RC_OK) return {rc, nullptr};
   if (data.type != self->type) {
-    if (data.state == CMPI_goodValue) return statusOf(CMPI_RC_ERR_TYPE_MISMATCH, "not the type of the array's elements");
+    if (data.state == CMPI_goodValue)
+      return statusOf(CMPI_RC_ERR_TYPE_MISMATCH, "not the type of the array's elements");
     data.type = self->type;
   }
   self->elements[index] = data;
@@ -46,12 +47,8 @@ CMPIStatus setElementAt(CMPIArray* handle, CMPICount index, const CMPIValue* val
 }  // namespace
 
 CMPIArrayFT ArrayObject::table = {
-    kTableVersion,
-    releaseObject<ArrayObject>,
-    guarded<cloneObject<ArrayObject, copyArray>>,
-    guarded<getSize>,
-    guarded<getSimpleType>,
-    guarded<getElementAt>,
+    kTableVersion,         releaseObject<ArrayObject>, guarded<cloneObject<ArrayObject, copyArray>>,
+    guarded<getSize>,      guarded<getSimpleType>,     guarded<getElementAt>,
     guarded<setElementAt>,
 };
 

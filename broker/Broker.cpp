@@ -227,8 +227,8 @@ Status makeArguments(Arena& arena, const PathObject& path, std::string_view meth
     for (const schema::Parameter& parameter : declared->parameters) {
       if (!schema::sameName(parameter.name, argument.name)) continue;
       CMPIData data;
-      Status status = makeData(arena, declaredType(parameter), argument.value, declared->name + "." + parameter.name,
-                               data);
+      Status status =
+          makeData(arena, declaredType(parameter), argument.value, declared->name + "." + parameter.name, data);
       if (!status.ok()) return status;
       arguments.set(arena, arena.intern(parameter.name), data);
     }

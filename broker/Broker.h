@@ -14,8 +14,9 @@
 // A CMPI 2.0 broker in this process: it loads providers, asks them what a client asks, and is what they call back to.
 //
 // Threads: after its construction one Broker may be used by any number of threads at once; each request runs on the
-// thread that makes it, with memory of its own that is gone when the request ends. Sinks are called on that thread (save
-// where a provider delivers from an attached thread: then one call at a time). The log hook may be called on any thread.
+// thread that makes it, with memory of its own that is gone when the request ends. Sinks are called on that thread
+// (save where a provider delivers from an attached thread: then one call at a time). The log hook may be called on any
+// thread.
 //
 // Names of classes, properties, keys, methods, parameters and namespaces are taken in any case and handed on, and given
 // back, in the schema's own spelling. An empty namespace stands for the registry's default.
@@ -47,8 +48,8 @@ struct Caller {
   std::string contentLanguage;
 };
 
-/// What of each instance is wanted (DSP0200 5.3.2.2, 5.3.2.11). Qualifiers and class origins are added by who writes the
-/// answer, from Property::declaration; here they are only told to the provider.
+/// What of each instance is wanted (DSP0200 5.3.2.2, 5.3.2.11). Qualifiers and class origins are added by who writes
+/// the answer, from Property::declaration; here they are only told to the provider.
 struct Selection {
   bool localOnly = false;
   bool deepInheritance = true;
@@ -89,20 +90,19 @@ class Broker {
   Broker(const Broker&) = delete;
   Broker& operator=(const Broker&) = delete;
 
-  /// The instances of a class and of the classes below it that are served, the class itself first. CIM_ERR_NOT_SUPPORTED
-  /// where nobody serves any of them. The status comes after all results; results may have come before a failure.
-  /// A provider library that cannot be loaded fails the request where the class asked for is its own; a request for a
-  /// superclass passes over it with a line in the log, unless nothing else is left.
+  /// The instances of a class and of the classes below it that are served, the class itself first.
+  /// CIM_ERR_NOT_SUPPORTED where nobody serves any of them. The status comes after all results; results may have come
+  /// before a failure. A provider library that cannot be loaded fails the request where the class asked for is its own;
+  /// a request for a superclass passes over it with a line in the log, unless nothing else is left.
   Status enumerateInstances(std::string_view nameSpace, std::string_view className, const Selection& selection,
                             const InstanceSink& sink, const Caller& caller = {});
   Status enumerateInstanceNames(std::string_view nameSpace, std::string_view className, const PathSink& sink,
                                 const Caller& caller = {});
 
   /// One instance. Key values may be texts where the schema says otherwise (an untyped KEYVALUE, a path text): they are
-  /// turned into the key's type; a text at a reference is read as a path text. Keys may be missing: the provider decides.
-  /// CIM_ERR_NOT_FOUND where the provider returns nothing.
-  Status getInstance(const ObjectPath& path, const Selection& selection, Instance& instance,
-                     const Caller& caller = {});
+  /// turned into the key's type; a text at a reference is read as a path text. Keys may be missing: the provider
+  /// decides. CIM_ERR_NOT_FOUND where the provider returns nothing.
+  Status getInstance(const ObjectPath& path, const Selection& selection, Instance& instance, const Caller& caller = {});
 
   /// `instance.path` names class and namespace. `created` gets the name of what was made.
   Status createInstance(const Instance& instance, ObjectPath& created, const Caller& caller = {});
@@ -113,11 +113,11 @@ class Broker {
 
   Status deleteInstance(const ObjectPath& path, const Caller& caller = {});
 
-  /// The objects at the far ends of the associations of `path`. Every concrete served association that fits the filter is
-  /// asked under its own name; what comes back is checked against `resultClass`. A class in the filter that does not
-  /// exist is CIM_ERR_INVALID_PARAMETER. Where several associations are asked, one that answers "not supported" or whose
-  /// library cannot be loaded is passed over (the latter with a line in the log) unless all are so; after any other
-  /// failure the rest are still asked, and the first failure is the status.
+  /// The objects at the far ends of the associations of `path`. Every concrete served association that fits the filter
+  /// is asked under its own name; what comes back is checked against `resultClass`. A class in the filter that does not
+  /// exist is CIM_ERR_INVALID_PARAMETER. Where several associations are asked, one that answers "not supported" or
+  /// whose library cannot be loaded is passed over (the latter with a line in the log) unless all are so; after any
+  /// other failure the rest are still asked, and the first failure is the status.
   Status associators(const ObjectPath& path, const AssociationFilter& filter, const Selection& selection,
                      const InstanceSink& sink, const Caller& caller = {});
   Status associatorNames(const ObjectPath& path, const AssociationFilter& filter, const PathSink& sink,
@@ -136,12 +136,12 @@ class Broker {
   const schema::ClassRepository& classes() const noexcept;
   const ProviderRegistry& registry() const noexcept;
 
-  /// `path` as the providers would see it: names in the schema's spelling, key values in the schema's types, in the order
-  /// of the schema's keys. The same failures as a request with that path has.
+  /// `path` as the providers would see it: names in the schema's spelling, key values in the schema's types, in the
+  /// order of the schema's keys. The same failures as a request with that path has.
   Status canonicalPath(const ObjectPath& path, ObjectPath& canonical) const;
 
-  /// The broker as providers see it, for what speaks CMPI itself. CMPI objects can be made only while a Scope is open on
-  /// the thread (broker/Scope.h).
+  /// The broker as providers see it, for what speaks CMPI itself. CMPI objects can be made only while a Scope is open
+  /// on the thread (broker/Scope.h).
   const _CMPIBroker* handle() const noexcept;
 
  private:

@@ -6,8 +6,8 @@
 #include "broker/Request.h"
 #include "broker/TableSupport.h"
 
-// CMPIBrokerFT: what the broker is, threads, and the up-calls of providers. An up-call is a request of its own, nested in
-// that of its caller; what it gives back is copied into the caller's scope.
+// CMPIBrokerFT: what the broker is, threads, and the up-calls of providers. An up-call is a request of its own, nested
+// in that of its caller; what it gives back is copied into the caller's scope.
 //
 // The invocation flags of the context are those of the client's own request and are not applied to what a provider asks
 // for itself: a client that wants local properties only must not take the keys from under a provider's feet.
@@ -322,8 +322,8 @@ CMPIStatus setProperty(const CMPIBroker* broker, const CMPIContext* context, con
   return statusOf(static_cast<CMPIrc>(result.rc), result.message);
 }
 
-CMPIData getProperty(const CMPIBroker* broker, const CMPIContext* context, const CMPIObjectPath* path,
-                     const char* name, CMPIStatus* status) {
+CMPIData getProperty(const CMPIBroker* broker, const CMPIContext* context, const CMPIObjectPath* path, const char* name,
+                     CMPIStatus* status) {
   CMPIStatus fetched{CMPI_RC_OK, nullptr};
   Shape shape;
   shape.properties.emplace().push_back(orEmpty(name));

@@ -15,8 +15,8 @@ ClassInfo::ClassInfo(const schema::Class& declared) : declared_(declared), nameO
     const auto index = static_cast<std::uint16_t>(properties_.size());
     const bool takesInstance = schema::findQualifier(property->qualifiers, "EmbeddedInstance") != nullptr ||
                                schema::hasQualifier(property->qualifiers, "EmbeddedObject");
-    properties_.push_back({property, &names_.back(), cmpiType(property->type, property->isArray), index,
-                           property->isKey, takesInstance});
+    properties_.push_back(
+        {property, &names_.back(), cmpiType(property->type, property->isArray), index, property->isKey, takesInstance});
     std::size_t bucket = schema::nameHash(property->name) & (size - 1);
     while (buckets_[bucket] != 0) bucket = (bucket + 1) & (size - 1);
     buckets_[bucket] = static_cast<std::uint16_t>(index + 1);
@@ -35,7 +35,8 @@ const PropertyInfo* ClassInfo::find(std::string_view name) const noexcept {
   return nullptr;
 }
 
-ClassTable::ClassTable(std::shared_ptr<const schema::ClassRepository> repository) : repository_(std::move(repository)) {}
+ClassTable::ClassTable(std::shared_ptr<const schema::ClassRepository> repository)
+    : repository_(std::move(repository)) {}
 
 const ClassInfo* ClassTable::find(std::string_view name) const {
   {
@@ -54,21 +55,51 @@ const ClassInfo* ClassTable::find(std::string_view name) const {
 CMPIType cmpiType(schema::Type type, bool isArray) noexcept {
   CMPIType simple = CMPI_string;
   switch (type) {
-    case schema::Type::Boolean: simple = CMPI_boolean; break;
-    case schema::Type::String: simple = CMPI_string; break;
-    case schema::Type::DateTime: simple = CMPI_dateTime; break;
-    case schema::Type::Char16: simple = CMPI_char16; break;
-    case schema::Type::Uint8: simple = CMPI_uint8; break;
-    case schema::Type::Sint8: simple = CMPI_sint8; break;
-    case schema::Type::Uint16: simple = CMPI_uint16; break;
-    case schema::Type::Sint16: simple = CMPI_sint16; break;
-    case schema::Type::Uint32: simple = CMPI_uint32; break;
-    case schema::Type::Sint32: simple = CMPI_sint32; break;
-    case schema::Type::Uint64: simple = CMPI_uint64; break;
-    case schema::Type::Sint64: simple = CMPI_sint64; break;
-    case schema::Type::Real32: simple = CMPI_real32; break;
-    case schema::Type::Real64: simple = CMPI_real64; break;
-    case schema::Type::Reference: simple = CMPI_ref; break;
+    case schema::Type::Boolean:
+      simple = CMPI_boolean;
+      break;
+    case schema::Type::String:
+      simple = CMPI_string;
+      break;
+    case schema::Type::DateTime:
+      simple = CMPI_dateTime;
+      break;
+    case schema::Type::Char16:
+      simple = CMPI_char16;
+      break;
+    case schema::Type::Uint8:
+      simple = CMPI_uint8;
+      break;
+    case schema::Type::Sint8:
+      simple = CMPI_sint8;
+      break;
+    case schema::Type::Uint16:
+      simple = CMPI_uint16;
+      break;
+    case schema::Type::Sint16:
+      simple = CMPI_sint16;
+      break;
+    case schema::Type::Uint32:
+      simple = CMPI_uint32;
+      break;
+    case schema::Type::Sint32:
+      simple = CMPI_sint32;
+      break;
+    case schema::Type::Uint64:
+      simple = CMPI_uint64;
+      break;
+    case schema::Type::Sint64:
+      simple = CMPI_sint64;
+      break;
+    case schema::Type::Real32:
+      simple = CMPI_real32;
+      break;
+    case schema::Type::Real64:
+      simple = CMPI_real64;
+      break;
+    case schema::Type::Reference:
+      simple = CMPI_ref;
+      break;
   }
   return static_cast<CMPIType>(isArray ? simple | CMPI_ARRAY : simple);
 }

@@ -59,7 +59,8 @@ class ClassTable {
  private:
   const std::shared_ptr<const schema::ClassRepository> repository_;
   mutable std::shared_mutex mutex_;
-  mutable std::unordered_map<std::string_view, std::unique_ptr<ClassInfo>, schema::NameHash, schema::NameEqual> classes_;
+  mutable std::unordered_map<std::string_view, std::unique_ptr<ClassInfo>, schema::NameHash, schema::NameEqual>
+      classes_;
 };
 
 /// The CMPI type of a schema's type.

@@ -57,12 +57,8 @@ CMPIStatus addEntry(const CMPIContext* handle, const char* name, const CMPIValue
 }  // namespace
 
 CMPIContextFT ContextObject::table = {
-    kTableVersion,
-    releaseObject<ContextObject>,
-    guarded<cloneObject<ContextObject, copyContext>>,
-    guarded<getEntry>,
-    guarded<getEntryAt>,
-    guarded<getEntryCount>,
+    kTableVersion,     releaseObject<ContextObject>, guarded<cloneObject<ContextObject, copyContext>>,
+    guarded<getEntry>, guarded<getEntryAt>,          guarded<getEntryCount>,
     guarded<addEntry>,
 };
 

@@ -58,21 +58,36 @@ void fillScalar(const CMPIData& data, Scalar& scalar) {
 
 schema::Type schemaType(CMPIType type) noexcept {
   switch (type) {
-    case CMPI_boolean: return schema::Type::Boolean;
-    case CMPI_char16: return schema::Type::Char16;
-    case CMPI_real32: return schema::Type::Real32;
-    case CMPI_real64: return schema::Type::Real64;
-    case CMPI_uint8: return schema::Type::Uint8;
-    case CMPI_uint16: return schema::Type::Uint16;
-    case CMPI_uint32: return schema::Type::Uint32;
-    case CMPI_uint64: return schema::Type::Uint64;
-    case CMPI_sint8: return schema::Type::Sint8;
-    case CMPI_sint16: return schema::Type::Sint16;
-    case CMPI_sint32: return schema::Type::Sint32;
-    case CMPI_sint64: return schema::Type::Sint64;
-    case CMPI_ref: return schema::Type::Reference;
-    case CMPI_dateTime: return schema::Type::DateTime;
-    default: return schema::Type::String;
+    case CMPI_boolean:
+      return schema::Type::Boolean;
+    case CMPI_char16:
+      return schema::Type::Char16;
+    case CMPI_real32:
+      return schema::Type::Real32;
+    case CMPI_real64:
+      return schema::Type::Real64;
+    case CMPI_uint8:
+      return schema::Type::Uint8;
+    case CMPI_uint16:
+      return schema::Type::Uint16;
+    case CMPI_uint32:
+      return schema::Type::Uint32;
+    case CMPI_uint64:
+      return schema::Type::Uint64;
+    case CMPI_sint8:
+      return schema::Type::Sint8;
+    case CMPI_sint16:
+      return schema::Type::Sint16;
+    case CMPI_sint32:
+      return schema::Type::Sint32;
+    case CMPI_sint64:
+      return schema::Type::Sint64;
+    case CMPI_ref:
+      return schema::Type::Reference;
+    case CMPI_dateTime:
+      return schema::Type::DateTime;
+    default:
+      return schema::Type::String;
   }
 }
 
@@ -252,7 +267,8 @@ class ScalarMaker {
   /// A text that stands for a number, a boolean or a character.
   std::string untyped(const std::string& text) {
     if (data_.type == CMPI_boolean) {
-      if (schema::sameName(text, "true") || schema::sameName(text, "false")) return (*this)(schema::sameName(text, "true"));
+      if (schema::sameName(text, "true") || schema::sameName(text, "false"))
+        return (*this)(schema::sameName(text, "true"));
       return mismatch(quotedText(text));
     }
     if (data_.type == CMPI_char16) {
@@ -307,8 +323,8 @@ Status makeData(Arena& arena, const DeclaredType& declared, const Value& value, 
   data = nullData(cmpiType(declared.type, declared.isArray));
   if (value.isNull) return {};
   if (value.isArray != declared.isArray) {
-    return mismatched(what, declared.isArray ? "one value where an array is declared"
-                                             : "an array where one value is declared");
+    return mismatched(
+        what, declared.isArray ? "one value where an array is declared" : "an array where one value is declared");
   }
   const Nesting level;
   if (!declared.isArray) {
@@ -348,8 +364,8 @@ Status addKnownKeys(Arena& arena, const ObjectPath& path, PathObject& object) {
     const Value* value = path.key(property.declared->name);
     if (value == nullptr) continue;
     CMPIData data;
-    Status status = makeData(arena, declaredType(property), *value, object.info->name() + "." + property.declared->name,
-                             data);
+    Status status =
+        makeData(arena, declaredType(property), *value, object.info->name() + "." + property.declared->name, data);
     if (!status.ok()) return {CMPI_RC_ERR_INVALID_PARAMETER, std::move(status.message)};
     object.keys.append(arena, property.name, data);
     if (object.keys.size() == path.keys.size()) break;

@@ -8,8 +8,8 @@
 
 // Between the plain values that clients use and the CMPI objects that providers use.
 //
-// The functions that fill a plain value reuse what it holds already: filling the same one again and again allocates next
-// to nothing.
+// The functions that fill a plain value reuse what it holds already: filling the same one again and again allocates
+// next to nothing.
 
 namespace zorva::broker {
 
@@ -43,8 +43,9 @@ Status makeData(Arena& arena, const DeclaredType& declared, const Value& value, 
 Status makeData(Arena& arena, const Value& value, std::string_view what, CMPIData& data);
 
 /// Makes a path whose names are in the schema's spelling and whose keys have the schema's types and order. A class that
-/// the schema lacks is CMPI_RC_ERR_INVALID_CLASS where `classMustExist`, else its keys are taken as they are. A key that
-/// the class lacks, or whose value does not fit, is CMPI_RC_ERR_INVALID_PARAMETER. The namespace is taken as it is.
+/// the schema lacks is CMPI_RC_ERR_INVALID_CLASS where `classMustExist`, else its keys are taken as they are. A key
+/// that the class lacks, or whose value does not fit, is CMPI_RC_ERR_INVALID_PARAMETER. The namespace is taken as it
+/// is.
 Status makePath(Arena& arena, const ObjectPath& path, bool classMustExist, PathObject*& object);
 
 /// Makes an instance with the properties of `instance` and the keys of its path.

@@ -89,8 +89,7 @@ CMPIType keptType(CMPIType type) noexcept {
   const auto array = static_cast<CMPIType>(type & CMPI_ARRAY);
   const auto simple = static_cast<CMPIType>(type & ~CMPI_ARRAY);
   if (simple == CMPI_chars || simple == CMPI_charsptr) return static_cast<CMPIType>(CMPI_string | array);
-  const bool object =
-      simple == CMPI_string || simple == CMPI_dateTime || simple == CMPI_ref || simple == CMPI_instance;
+  const bool object = simple == CMPI_string || simple == CMPI_dateTime || simple == CMPI_ref || simple == CMPI_instance;
   return object || simpleSize(simple) != 0 ? type : CMPIType{CMPI_null};
 }
 
@@ -183,8 +182,7 @@ StringObject* copyString(Arena& arena, const StringObject& text) {
 
 DateTimeObject* copyDateTime(Arena& arena, const DateTimeObject& dateTime) {
   if (dateTime.arena == &arena) return const_cast<DateTimeObject*>(&dateTime);
-  return arena.make<DateTimeObject>(arena, copyString(arena, *dateTime.text), dateTime.microseconds,
-                                    dateTime.interval);
+  return arena.make<DateTimeObject>(arena, copyString(arena, *dateTime.text), dateTime.microseconds, dateTime.interval);
 }
 
 ArrayObject* copyArray(Arena& arena, const ArrayObject& array) {

@@ -15,9 +15,10 @@ struct PropertyInfo;
 CMPIType keptType(CMPIType type) noexcept;
 
 /// Copies what a setter was given: `value` points at the value, save for CMPI_chars, where it is the C string itself;
-/// null stands for no value, as the type CMPI_null does. Only as many bytes are read as the type has. The objects of another broker are read through
-/// their own tables. CMPI_RC_ERR_INVALID_DATA_TYPE for a type that cannot be kept, CMPI_RC_ERR_INVALID_HANDLE for an
-/// object of the wrong kind, CMPI_RC_ERR_TYPE_MISMATCH for an array of other elements than `type` says.
+/// null stands for no value, as the type CMPI_null does. Only as many bytes are read as the type has. The objects of
+/// another broker are read through their own tables. CMPI_RC_ERR_INVALID_DATA_TYPE for a type that cannot be kept,
+/// CMPI_RC_ERR_INVALID_HANDLE for an object of the wrong kind, CMPI_RC_ERR_TYPE_MISMATCH for an array of other elements
+/// than `type` says.
 CMPIrc importData(Arena& arena, const CMPIValue* value, CMPIType type, CMPIData& data);
 
 /// A copy of data that an object of ours holds. Texts and date-times of the same arena are shared.
@@ -42,8 +43,8 @@ InstanceObject* copyInstance(Arena& arena, const InstanceObject& instance);
 ArgsObject* copyArgs(Arena& arena, const ArgsObject& args);
 void copyEntries(Arena& arena, const EntryList& from, EntryList& to);
 
-// What a handle stands for, as an object of ours in `arena` (an object of ours is copied as above). Null where the handle
-// is null, without insides, or of the wrong kind; or where another broker's object cannot be read.
+// What a handle stands for, as an object of ours in `arena` (an object of ours is copied as above). Null where the
+// handle is null, without insides, or of the wrong kind; or where another broker's object cannot be read.
 StringObject* adoptString(Arena& arena, const CMPIString* handle);
 DateTimeObject* adoptDateTime(Arena& arena, const CMPIDateTime* handle);
 ArrayObject* adoptArray(Arena& arena, const CMPIArray* handle);

@@ -5,9 +5,9 @@
 #include <string>
 #include <string_view>
 
-// CIM's date-times as text (DSP0004 5.2.4): a point in time is yyyymmddhhmmss.mmmmmmsutc (utc in minutes, s its sign), an
-// interval ddddddddhhmmss.mmmmmm:000, 25 characters each. Fields that are not known hold asterisks and count as zero (as
-// one in month and day). These functions keep no state.
+// CIM's date-times as text (DSP0004 5.2.4): a point in time is yyyymmddhhmmss.mmmmmmsutc (utc in minutes, s its sign),
+// an interval ddddddddhhmmss.mmmmmm:000, 25 characters each. Fields that are not known hold asterisks and count as zero
+// (as one in month and day). These functions keep no state.
 
 namespace zorva::broker {
 
@@ -19,7 +19,8 @@ struct DateTimeValue {
 /// Nothing where `text` is no date-time. Points before 1970 are refused: CMPI has no number for them.
 std::optional<DateTimeValue> parseDateTime(std::string_view text);
 
-/// The 25 characters, points in time in UTC. Nothing for what is past the year 9999, or an interval of 10^8 days or more.
+/// The 25 characters, points in time in UTC. Nothing for what is past the year 9999, or an interval of 10^8 days or
+/// more.
 std::optional<std::string> dateTimeText(const DateTimeValue& value);
 
 }  // namespace zorva::broker

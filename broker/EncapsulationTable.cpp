@@ -74,8 +74,8 @@ CMPIDateTime* dateTimeOf(Arena& arena, const DateTimeValue& value, CMPIStatus* s
 CMPIDateTime* newDateTime(const CMPIBroker* broker, CMPIStatus* status) {
   Arena* arena = arenaFor(broker, status);
   if (arena == nullptr) return nullptr;
-  const auto now = std::chrono::duration_cast<std::chrono::microseconds>(
-      std::chrono::system_clock::now().time_since_epoch());
+  const auto now =
+      std::chrono::duration_cast<std::chrono::microseconds>(std::chrono::system_clock::now().time_since_epoch());
   return dateTimeOf(*arena, {static_cast<std::uint64_t>(now.count()), false}, status);
 }
 
@@ -138,19 +138,34 @@ std::vector<std::string> inserts(CMPICount count, va_list arguments) {
   // Past ten there is no placeholder; a count that is not true must not be believed.
   for (CMPICount i = 0; i < count && i < 10; ++i) {
     switch (va_arg(arguments, int)) {
-      case CMPI_sint32: texts.push_back(std::to_string(va_arg(arguments, long))); break;
-      case CMPI_uint32: texts.push_back(std::to_string(va_arg(arguments, unsigned long))); break;
-      case CMPI_sint64: texts.push_back(std::to_string(va_arg(arguments, long long))); break;
-      case CMPI_uint64: texts.push_back(std::to_string(va_arg(arguments, unsigned long long))); break;
-      case CMPI_real64: texts.push_back(std::to_string(va_arg(arguments, double))); break;
-      case CMPI_boolean: texts.emplace_back(va_arg(arguments, int) != 0 ? "true" : "false"); break;
+      case CMPI_sint32:
+        texts.push_back(std::to_string(va_arg(arguments, long)));
+        break;
+      case CMPI_uint32:
+        texts.push_back(std::to_string(va_arg(arguments, unsigned long)));
+        break;
+      case CMPI_sint64:
+        texts.push_back(std::to_string(va_arg(arguments, long long)));
+        break;
+      case CMPI_uint64:
+        texts.push_back(std::to_string(va_arg(arguments, unsigned long long)));
+        break;
+      case CMPI_real64:
+        texts.push_back(std::to_string(va_arg(arguments, double)));
+        break;
+      case CMPI_boolean:
+        texts.emplace_back(va_arg(arguments, int) != 0 ? "true" : "false");
+        break;
       case CMPI_chars: {
         const char* text = va_arg(arguments, const char*);
         texts.emplace_back(text != nullptr ? text : "");
         break;
       }
-      case CMPI_string: texts.emplace_back(textOf(va_arg(arguments, const CMPIString*))); break;
-      default: return texts;  // how long the value is, nobody knows: what follows cannot be read
+      case CMPI_string:
+        texts.emplace_back(textOf(va_arg(arguments, const CMPIString*)));
+        break;
+      default:
+        return texts;  // how long the value is, nobody knows: what follows cannot be read
     }
   }
   return texts;
@@ -160,9 +175,9 @@ std::vector<std::string> inserts(CMPICount count, va_list arguments) {
 std::string composed(std::string_view pattern, const std::vector<std::string>& texts) {
   std::string message;
   for (std::size_t i = 0; i < pattern.size(); ++i) {
-    const bool placeholder =
-        pattern[i] == '{' && i + 2 < pattern.size() && pattern[i + 2] == '}' && pattern[i + 1] >= '0' &&
-        pattern[i + 1] <= '9' && static_cast<std::size_t>(pattern[i + 1] - '0') < texts.size();
+    const bool placeholder = pattern[i] == '{' && i + 2 < pattern.size() && pattern[i + 2] == '}' &&
+                             pattern[i + 1] >= '0' && pattern[i + 1] <= '9' &&
+                             static_cast<std::size_t>(pattern[i + 1] - '0') < texts.size();
     if (!placeholder) {
       message += pattern[i];
       continue;
@@ -235,10 +250,14 @@ CMPIStatus writeLog(const CMPIBroker* broker, LogLevel level, const char* id, co
 CMPIStatus logMessage(const CMPIBroker* broker, int severity, const char* id, const char* text,
                       const CMPIString* string) {
   switch (severity) {
-    case CMPI_SEV_ERROR: return writeLog(broker, LogLevel::Error, id, text, string);
-    case CMPI_SEV_WARNING: return writeLog(broker, LogLevel::Warning, id, text, string);
-    case CMPI_SEV_INFO: return writeLog(broker, LogLevel::Info, id, text, string);
-    default: return writeLog(broker, LogLevel::Debug, id, text, string);
+    case CMPI_SEV_ERROR:
+      return writeLog(broker, LogLevel::Error, id, text, string);
+    case CMPI_SEV_WARNING:
+      return writeLog(broker, LogLevel::Warning, id, text, string);
+    case CMPI_SEV_INFO:
+      return writeLog(broker, LogLevel::Info, id, text, string);
+    default:
+      return writeLog(broker, LogLevel::Debug, id, text, string);
   }
 }
 

@@ -13,10 +13,9 @@ StringObject* copySet(Arena& arena, const StringObject* text) {
 ErrorObject* copyError(Arena& arena, const ErrorObject& error) {
   auto* copy = arena.make<ErrorObject>(arena);
   copy->codes = error.codes;
-  for (StringObject* ErrorObject::*text :
-       {&ErrorObject::otherType, &ErrorObject::owningEntity, &ErrorObject::messageId, &ErrorObject::message,
-        &ErrorObject::causeDescription, &ErrorObject::source, &ErrorObject::otherSourceFormat,
-        &ErrorObject::statusDescription}) {
+  for (StringObject* ErrorObject::*text : {&ErrorObject::otherType, &ErrorObject::owningEntity, &ErrorObject::messageId,
+                                           &ErrorObject::message, &ErrorObject::causeDescription, &ErrorObject::source,
+                                           &ErrorObject::otherSourceFormat, &ErrorObject::statusDescription}) {
     copy->*text = copySet(arena, error.*text);
   }
   if (error.actions != nullptr) copy->actions = copyArray(arena, *error.actions);

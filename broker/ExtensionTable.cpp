@@ -65,7 +65,9 @@ void* newThread(void* (*start)(void*), void* parameter, int detached) {
   return failure == 0 ? handleOf(thread) : nullptr;
 }
 
-int joinThread(void* thread, void** result) { return thread != nullptr ? pthread_join(threadOf(thread), result) : EINVAL; }
+int joinThread(void* thread, void** result) {
+  return thread != nullptr ? pthread_join(threadOf(thread), result) : EINVAL;
+}
 
 int exitThread(void* result) { pthread_exit(result); }
 
@@ -163,26 +165,16 @@ int signalCondition(void* handle) {
 }  // namespace
 
 CMPIBrokerExtFT extensionTable = {
-    kTableVersion,
-    guarded<resolveFileName>,
-    newThread,
-    joinThread,
-    exitThread,
-    cancelThread,
-    threadSleep,
-    threadOnce,
-    createThreadKey,
-    destroyThreadKey,
-    getThreadSpecific,
-    setThreadSpecific,
-    newMutex,
-    destroyMutex,
-    lockMutex,
-    unlockMutex,
-    newCondition,
-    destroyCondition,
-    condWait,
-    timedCondWait,
+    kTableVersion,     guarded<resolveFileName>,
+    newThread,         joinThread,
+    exitThread,        cancelThread,
+    threadSleep,       threadOnce,
+    createThreadKey,   destroyThreadKey,
+    getThreadSpecific, setThreadSpecific,
+    newMutex,          destroyMutex,
+    lockMutex,         unlockMutex,
+    newCondition,      destroyCondition,
+    condWait,          timedCondWait,
     signalCondition,
 };
 

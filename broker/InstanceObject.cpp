@@ -122,17 +122,10 @@ CMPIStatus setPropertyWithOrigin(const CMPIInstance* handle, const char* name, c
 }  // namespace
 
 CMPIInstanceFT InstanceObject::table = {
-    kTableVersion,
-    releaseObject<InstanceObject>,
-    guarded<cloneObject<InstanceObject, copyInstance>>,
-    guarded<getProperty>,
-    guarded<getPropertyAt>,
-    guarded<getPropertyCount>,
-    guarded<setProperty>,
-    guarded<getObjectPath>,
-    guarded<setPropertyFilter>,
-    guarded<setObjectPath>,
-    guarded<setPropertyWithOrigin>,
+    kTableVersion,          releaseObject<InstanceObject>,  guarded<cloneObject<InstanceObject, copyInstance>>,
+    guarded<getProperty>,   guarded<getPropertyAt>,         guarded<getPropertyCount>,
+    guarded<setProperty>,   guarded<getObjectPath>,         guarded<setPropertyFilter>,
+    guarded<setObjectPath>, guarded<setPropertyWithOrigin>,
 };
 
 InstanceObject* InstanceObject::make(Arena& arena, const PathObject& path) {

@@ -20,20 +20,28 @@ constexpr bool isRealType(CMPIType type) noexcept { return type == CMPI_real32 |
 /// The number in `data`, whose type is an unsigned one.
 inline std::uint64_t unsignedOf(const CMPIData& data) noexcept {
   switch (data.type) {
-    case CMPI_uint8: return data.value.uint8;
-    case CMPI_uint16: return data.value.uint16;
-    case CMPI_uint32: return data.value.uint32;
-    default: return data.value.uint64;
+    case CMPI_uint8:
+      return data.value.uint8;
+    case CMPI_uint16:
+      return data.value.uint16;
+    case CMPI_uint32:
+      return data.value.uint32;
+    default:
+      return data.value.uint64;
   }
 }
 
 /// The number in `data`, whose type is a signed one.
 inline std::int64_t signedOf(const CMPIData& data) noexcept {
   switch (data.type) {
-    case CMPI_sint8: return data.value.sint8;
-    case CMPI_sint16: return data.value.sint16;
-    case CMPI_sint32: return data.value.sint32;
-    default: return data.value.sint64;
+    case CMPI_sint8:
+      return data.value.sint8;
+    case CMPI_sint16:
+      return data.value.sint16;
+    case CMPI_sint32:
+      return data.value.sint32;
+    default:
+      return data.value.sint64;
   }
 }
 
@@ -46,22 +54,32 @@ bool placeNumber(Narrow& member, Wide number) noexcept {
 /// Puts a number into `data` by its type, which is an unsigned one. False where it does not fit.
 inline bool placeUnsigned(CMPIData& data, std::uint64_t number) noexcept {
   switch (data.type) {
-    case CMPI_uint8: return placeNumber(data.value.uint8, number);
-    case CMPI_uint16: return placeNumber(data.value.uint16, number);
-    case CMPI_uint32: return placeNumber(data.value.uint32, number);
-    case CMPI_uint64: return placeNumber(data.value.uint64, number);
-    default: return false;
+    case CMPI_uint8:
+      return placeNumber(data.value.uint8, number);
+    case CMPI_uint16:
+      return placeNumber(data.value.uint16, number);
+    case CMPI_uint32:
+      return placeNumber(data.value.uint32, number);
+    case CMPI_uint64:
+      return placeNumber(data.value.uint64, number);
+    default:
+      return false;
   }
 }
 
 /// The same for the signed types.
 inline bool placeSigned(CMPIData& data, std::int64_t number) noexcept {
   switch (data.type) {
-    case CMPI_sint8: return placeNumber(data.value.sint8, number);
-    case CMPI_sint16: return placeNumber(data.value.sint16, number);
-    case CMPI_sint32: return placeNumber(data.value.sint32, number);
-    case CMPI_sint64: return placeNumber(data.value.sint64, number);
-    default: return false;
+    case CMPI_sint8:
+      return placeNumber(data.value.sint8, number);
+    case CMPI_sint16:
+      return placeNumber(data.value.sint16, number);
+    case CMPI_sint32:
+      return placeNumber(data.value.sint32, number);
+    case CMPI_sint64:
+      return placeNumber(data.value.sint64, number);
+    default:
+      return false;
   }
 }
 

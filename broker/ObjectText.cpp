@@ -130,15 +130,22 @@ std::string dataText(const CMPIData& data) {
   if (isUnsignedType(data.type)) return std::to_string(unsignedOf(data));
   if (isSignedType(data.type)) return std::to_string(signedOf(data));
   switch (data.type) {
-    case CMPI_boolean: return data.value.boolean != 0 ? "TRUE" : "FALSE";
-    case CMPI_char16: return "\\x" + std::to_string(data.value.char16);
-    case CMPI_real32: return realText(static_cast<double>(data.value.real32));
-    case CMPI_real64: return realText(data.value.real64);
+    case CMPI_boolean:
+      return data.value.boolean != 0 ? "TRUE" : "FALSE";
+    case CMPI_char16:
+      return "\\x" + std::to_string(data.value.char16);
+    case CMPI_real32:
+      return realText(static_cast<double>(data.value.real32));
+    case CMPI_real64:
+      return realText(data.value.real64);
     case CMPI_dateTime:
     case CMPI_ref:
-    case CMPI_string: return quotedText(objectText(static_cast<const void*>(data.value.string)));
-    case CMPI_instance: return objectText(static_cast<const void*>(data.value.inst));
-    default: return "NULL";
+    case CMPI_string:
+      return quotedText(objectText(static_cast<const void*>(data.value.string)));
+    case CMPI_instance:
+      return objectText(static_cast<const void*>(data.value.inst));
+    default:
+      return "NULL";
   }
 }
 

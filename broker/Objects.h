@@ -9,13 +9,13 @@
 #include "cmpift.h"
 #include "cmpimacs.h"
 
-// The CMPI objects of this broker. Each begins with the handle that CMPI publishes (hdl, ft), hdl pointing at the object
-// itself, so that a handle of ours is told by its function table: own<InstanceObject>(handle) is the object behind it, or
-// null where the handle is null, of another kind, or another broker's.
+// The CMPI objects of this broker. Each begins with the handle that CMPI publishes (hdl, ft), hdl pointing at the
+// object itself, so that a handle of ours is told by its function table: own<InstanceObject>(handle) is the object
+// behind it, or null where the handle is null, of another kind, or another broker's.
 //
 // Objects live in an arena and have no destructor. Texts and date-times never change once made, so objects of one arena
-// share them; all others are copied when they become part of another. An arena pointer of null marks an object that lives
-// as long as the broker.
+// share them; all others are copied when they become part of another. An arena pointer of null marks an object that
+// lives as long as the broker.
 
 namespace zorva::schema {
 struct ClassProperty;
@@ -158,11 +158,7 @@ struct InstanceObject : CMPIInstance {
   };
 
   InstanceObject(Arena& owner, const ClassInfo& known) noexcept
-      : CMPIInstance{this, &table},
-        arena(&owner),
-        info(&known),
-        nameSpace(&emptyString()),
-        host(&emptyString()) {}
+      : CMPIInstance{this, &table}, arena(&owner), info(&known), nameSpace(&emptyString()), host(&emptyString()) {}
   InstanceObject(const InstanceObject&) = delete;
   InstanceObject& operator=(const InstanceObject&) = delete;
 
@@ -185,7 +181,7 @@ struct InstanceObject : CMPIInstance {
   Slot* slots = nullptr;
   std::uint32_t count = 0;
   std::uint32_t capacity = 0;
-  std::uint64_t* filter = nullptr;  ///< a bit for each property that may be set; null: all
+  std::uint64_t* filter = nullptr;       ///< a bit for each property that may be set; null: all
   const EntryList* looseKeys = nullptr;  ///< of a class without key properties: those of the path it was made from
 };
 

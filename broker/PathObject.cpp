@@ -10,7 +10,7 @@ namespace zorva::broker {
 
 namespace {
 
-CMPIStatus setNameSpace(CMPIObjectPath* handle, const char* name) {
+CMPIStatus setNamespaceText(CMPIObjectPath* handle, const char* name) {
   PathObject* self = own<PathObject>(handle);
   if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
   self->setNameSpace(name != nullptr ? name : "");
@@ -162,7 +162,7 @@ CMPIObjectPathFT PathObject::table = {
     kTableVersion,
     releaseObject<PathObject>,
     guarded<cloneObject<PathObject, copyPath>>,
-    guarded<setNameSpace>,
+    guarded<setNamespaceText>,
     guarded<getNameSpace>,
     guarded<setHostname>,
     guarded<getHostname>,

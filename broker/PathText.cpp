@@ -264,9 +264,7 @@ struct ScalarText {
 
 }  // namespace
 
-std::optional<PathTextError> parsePathText(std::string_view text, ObjectPath& path) {
-  return Reader(text).read(path);
-}
+std::optional<PathTextError> parsePathText(std::string_view text, ObjectPath& path) { return Reader(text).read(path); }
 
 std::string pathText(const ObjectPath& path) {
   std::string text;
@@ -286,14 +284,29 @@ std::string quotedText(std::string_view text) {
   std::string quoted = "\"";
   for (const char c : text) {
     switch (c) {
-      case '"': quoted += "\\\""; break;
-      case '\\': quoted += "\\\\"; break;
-      case '\n': quoted += "\\n"; break;
-      case '\t': quoted += "\\t"; break;
-      case '\r': quoted += "\\r"; break;
-      case '\b': quoted += "\\b"; break;
-      case '\f': quoted += "\\f"; break;
-      default: quoted += c;
+      case '"':
+        quoted += "\\\"";
+        break;
+      case '\\':
+        quoted += "\\\\";
+        break;
+      case '\n':
+        quoted += "\\n";
+        break;
+      case '\t':
+        quoted += "\\t";
+        break;
+      case '\r':
+        quoted += "\\r";
+        break;
+      case '\b':
+        quoted += "\\b";
+        break;
+      case '\f':
+        quoted += "\\f";
+        break;
+      default:
+        quoted += c;
     }
   }
   return quoted + "\"";

@@ -27,8 +27,8 @@ class ProviderLoader {
   ProviderLoader(const ProviderLoader&) = delete;
   ProviderLoader& operator=(const ProviderLoader&) = delete;
 
-  /// The MI of an entry of the registry; null with a failure that says what is missing. A failure is not remembered: the
-  /// next request tries again.
+  /// The MI of an entry of the registry; null with a failure that says what is missing. A failure is not remembered:
+  /// the next request tries again.
   const CMPIInstanceMI* instanceMi(const ProviderEntry& entry, Status& status);
   const CMPIAssociationMI* associationMi(const ProviderEntry& entry, Status& status);
   const CMPIMethodMI* methodMi(const ProviderEntry& entry, Status& status);

@@ -18,9 +18,9 @@ enum MiKind : unsigned {
 /// One class and who serves it.
 struct ProviderEntry {
   std::string className;
-  std::string prefix;      ///< the create functions are <prefix>_Create_InstanceMI, _AssociationMI, _MethodMI
-  std::string library;     ///< "x" stands for libx.so.1, or else libx.so, in the provider directory; or a path with "/"
-  unsigned kinds = 0;      ///< MiKind bits
+  std::string prefix;   ///< the create functions are <prefix>_Create_InstanceMI, _AssociationMI, _MethodMI
+  std::string library;  ///< "x" stands for libx.so.1, or else libx.so, in the provider directory; or a path with "/"
+  unsigned kinds = 0;   ///< MiKind bits
   std::string nameSpace = "root/cimv2";
 };
 

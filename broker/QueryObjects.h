@@ -4,8 +4,8 @@
 #include "cmpift.h"
 
 // Query expressions. This broker runs no queries and delivers no indications, so it never makes such an object; one of
-// each kind exists so that their function tables do: every function of them answers CMPI_RC_ERR_NOT_SUPPORTED, save that
-// releasing one is harmless.
+// each kind exists so that their function tables do: every function of them answers CMPI_RC_ERR_NOT_SUPPORTED, save
+// that releasing one is harmless.
 
 namespace zorva::broker {
 

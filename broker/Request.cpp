@@ -126,8 +126,8 @@ class Request::Filter : public Receiver {
     const std::string& name = property.declared->name;
     if (requested_ != nullptr && shape_.localOnly) {
       const schema::Class& origin = *property.declared->origin;
-      const bool local = shape_.deepInheritance ? origin.isA(requested_->declared())
-                                                : &origin == &requested_->declared();
+      const bool local =
+          shape_.deepInheritance ? origin.isA(requested_->declared()) : &origin == &requested_->declared();
       if (!local) return false;
     }
     if (requested_ != nullptr && !shape_.deepInheritance && requested_->find(name) == nullptr) return false;
@@ -207,9 +207,8 @@ const char** Request::providerList(const Shape& shape, const std::vector<const C
     for (std::size_t i = 0; i < classes.size() && known == nullptr; ++i) known = classes[i]->find(name);
     if (known == nullptr) continue;
     const char* spelling = known->name->chars;
-    const bool listed = std::any_of(list, list + count, [&](const char* other) {
-      return std::string_view(other) == known->name->view();
-    });
+    const bool listed = std::any_of(list, list + count,
+                                    [&](const char* other) { return std::string_view(other) == known->name->view(); });
     if (!listed) list[count++] = spelling;
   }
   return list;
@@ -324,8 +323,8 @@ Status Request::findInstanceMi(const PathObject& path, std::string_view operatio
   if (!status.ok()) return status;
   entry = entryOf(*resolved, *resolved->info, InstanceMi);
   if (entry == nullptr) {
-    return failure(CMPI_RC_ERR_NOT_SUPPORTED,
-                   "no provider serves " + resolved->info->name() + ", so " + std::string(operation) + " cannot be done");
+    return failure(CMPI_RC_ERR_NOT_SUPPORTED, "no provider serves " + resolved->info->name() + ", so " +
+                                                  std::string(operation) + " cannot be done");
   }
   mi = core_.loader().instanceMi(*entry, status);
   return status;
@@ -336,7 +335,8 @@ Status Request::get(const PathObject& path, const Shape& shape, Taker& taker) {
   const ProviderEntry* entry = nullptr;
   const CMPIInstanceMI* mi = nullptr;
   Status status = findInstanceMi(path, "GetInstance", resolved, entry, mi);
-  if (status.rc == CMPI_RC_ERR_NOT_SUPPORTED && resolved != nullptr && !servedBelow(*resolved, *resolved->info).empty()) {
+  if (status.rc == CMPI_RC_ERR_NOT_SUPPORTED && resolved != nullptr &&
+      !servedBelow(*resolved, *resolved->info).empty()) {
     // The class of an instance's name is the one that it was made of, never one above it.
     return failure(CMPI_RC_ERR_NOT_FOUND, "no instance has " + resolved->info->name() + " itself as its class");
   }
@@ -445,8 +445,8 @@ Status Request::findAssociations(const PathObject& path, const FarEnd& filter, b
   if (status.ok() && farEndMatters) status = known(filter.resultClass, "ResultClass", resultClass);
   if (!status.ok()) return status;
   const schema::Class& source = path.info->declared();
-  for (const schema::Class* candidate : core_.classes().repository().associationsOf(
-           source, ancestor != nullptr ? &ancestor->declared() : nullptr)) {
+  for (const schema::Class* candidate :
+       core_.classes().repository().associationsOf(source, ancestor != nullptr ? &ancestor->declared() : nullptr)) {
     const ClassInfo& info = core_.classes().of(*candidate);
     const ProviderEntry* entry = entryOf(path, info, AssociationMi);
     if (entry == nullptr) continue;
@@ -454,8 +454,7 @@ Status Request::findAssociations(const PathObject& path, const FarEnd& filter, b
                                   resultClass != nullptr ? &resultClass->declared() : nullptr);
     if (ends.nearEnd == nullptr) continue;
     const bool farNamed = ends.farEnd != nullptr && !filter.resultRole.empty();
-    found.push_back({&info, entry,
-                     ends.farEnd != nullptr ? &core_.classes().of(*ends.farEnd->reference) : nullptr,
+    found.push_back({&info, entry, ends.farEnd != nullptr ? &core_.classes().of(*ends.farEnd->reference) : nullptr,
                      filter.role.empty() ? nullptr : ends.nearEnd->name.c_str(),
                      farNamed ? ends.farEnd->name.c_str() : nullptr});
   }
@@ -481,8 +480,7 @@ Status Request::askEach(const std::vector<Association>& associations, const Filt
   return std::move(outcome).status();
 }
 
-Status Request::associated(const PathObject& path, Form form, const FarEnd& filter, const Shape& shape,
-                           Taker& taker) {
+Status Request::associated(const PathObject& path, Form form, const FarEnd& filter, const Shape& shape, Taker& taker) {
   PathObject* resolved = nullptr;
   Status status = resolve(path, resolved);
   if (!status.ok()) return status;
@@ -555,10 +553,9 @@ class ValueReceiver : public Receiver {
 /// The arguments of a call under the schema's names, checked against the schema's types.
 Status checkedArguments(const schema::ClassMethod& method, const EntryList& input, ArgsObject& arguments) {
   for (const EntryList::Entry& entry : input) {
-    const auto parameter =
-        std::find_if(method.parameters.begin(), method.parameters.end(), [&entry](const schema::Parameter& candidate) {
-          return schema::sameName(candidate.name, entry.name->view());
-        });
+    const auto parameter = std::find_if(
+        method.parameters.begin(), method.parameters.end(),
+        [&entry](const schema::Parameter& candidate) { return schema::sameName(candidate.name, entry.name->view()); });
     if (parameter == method.parameters.end()) {
       return failure(CMPI_RC_ERR_INVALID_PARAMETER, method.name + " has no parameter " + quoted(entry.name->view()));
     }
@@ -567,8 +564,8 @@ Status checkedArguments(const schema::ClassMethod& method, const EntryList& inpu
     CMPIData data = copyData(*arguments.arena, entry.data);
     if (data.state != CMPI_goodValue) data.type = type;
     if (!typeFits(type, declared.takesInstance, data.type)) {
-      return failure(CMPI_RC_ERR_TYPE_MISMATCH, method.name + ": the parameter " + parameter->name +
-                                                    " is declared with another type");
+      return failure(CMPI_RC_ERR_TYPE_MISMATCH,
+                     method.name + ": the parameter " + parameter->name + " is declared with another type");
     }
     arguments.list.set(*arguments.arena, arguments.arena->intern(parameter->name), data);
   }

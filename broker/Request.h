@@ -53,8 +53,8 @@ class Request {
   /// What the providers are given; empty at first.
   ContextObject& context() noexcept { return context_; }
 
-  // The operations. `path` lives in this request's arena or outlives it; its namespace may be in any spelling, and empty
-  // for the default. Statuses as Broker.h tells.
+  // The operations. `path` lives in this request's arena or outlives it; its namespace may be in any spelling, and
+  // empty for the default. Statuses as Broker.h tells.
   Status enumerate(const PathObject& path, Form form, const Shape& shape, Taker& taker);
   Status get(const PathObject& path, const Shape& shape, Taker& taker);
   Status create(const PathObject& path, const InstanceObject& instance, Taker& taker);

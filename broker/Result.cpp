@@ -39,8 +39,7 @@ CMPIStatus returnInstance(const CMPIResult* handle, const CMPIInstance* instance
     return {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
   }
   Arena* arena = currentArena();
-  const InstanceObject* object =
-      arena != nullptr ? readInstance(*arena, instance) : own<InstanceObject>(instance);
+  const InstanceObject* object = arena != nullptr ? readInstance(*arena, instance) : own<InstanceObject>(instance);
   if (object == nullptr) {
     self->drop(instance == nullptr ? "a null instance" : "an instance that cannot be read");
     return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
@@ -106,14 +105,8 @@ CMPIStatus returnError(const CMPIResult* handle, const CMPIError* error) {
 }  // namespace
 
 CMPIResultFT ResultObject::table = {
-    kTableVersion,
-    releaseObject<ResultObject>,
-    guarded<clone>,
-    guarded<returnData>,
-    guarded<returnInstance>,
-    guarded<returnObjectPath>,
-    guarded<returnDone>,
-    guarded<returnError>,
+    kTableVersion,           releaseObject<ResultObject>, guarded<clone>,      guarded<returnData>,
+    guarded<returnInstance>, guarded<returnObjectPath>,   guarded<returnDone>, guarded<returnError>,
 };
 
 bool Receiver::takeInstance(const InstanceObject& /*instance*/) { return true; }

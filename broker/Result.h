@@ -44,8 +44,8 @@ struct ResultObject : CMPIResult {
   const std::string who;
   Arena* arena = nullptr;  ///< it is in none: release() is harmless
 
-  std::mutex mutex;         // guards what follows
-  bool full = false;        ///< the receiver wants no more
+  std::mutex mutex;   // guards what follows
+  bool full = false;  ///< the receiver wants no more
   CMPIrc errorCode = CMPI_RC_OK;
   std::string errorMessage;
 };

@@ -10,8 +10,8 @@
 #include "cmpidt.h"
 
 // What one request on one thread has: the arena in which its CMPI objects are made, and the memory that its providers
-// asked for. Scopes nest as requests do: an up-call opens one within its caller's. The innermost scope of a thread is the
-// one in which objects are made.
+// asked for. Scopes nest as requests do: an up-call opens one within its caller's. The innermost scope of a thread is
+// the one in which objects are made.
 
 namespace zorva::broker {
 

@@ -8,8 +8,8 @@
 
 #include "broker/Objects.h"
 
-// What all function tables of the broker share. Their functions are called from C: nothing may be thrown out of them, and
-// each answers a handle that is null, of the wrong kind or foreign with CMPI_RC_ERR_INVALID_HANDLE.
+// What all function tables of the broker share. Their functions are called from C: nothing may be thrown out of them,
+// and each answers a handle that is null, of the wrong kind or foreign with CMPI_RC_ERR_INVALID_HANDLE.
 
 namespace zorva::broker {
 

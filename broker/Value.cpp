@@ -65,31 +65,56 @@ const Value* Instance::property(std::string_view name) const noexcept {
 
 std::string_view statusName(int rc) noexcept {
   switch (rc) {
-    case 0: return "CIM_ERR_SUCCESS";
-    case 1: return "CIM_ERR_FAILED";
-    case 2: return "CIM_ERR_ACCESS_DENIED";
-    case 3: return "CIM_ERR_INVALID_NAMESPACE";
-    case 4: return "CIM_ERR_INVALID_PARAMETER";
-    case 5: return "CIM_ERR_INVALID_CLASS";
-    case 6: return "CIM_ERR_NOT_FOUND";
-    case 7: return "CIM_ERR_NOT_SUPPORTED";
-    case 8: return "CIM_ERR_CLASS_HAS_CHILDREN";
-    case 9: return "CIM_ERR_CLASS_HAS_INSTANCES";
-    case 10: return "CIM_ERR_INVALID_SUPERCLASS";
-    case 11: return "CIM_ERR_ALREADY_EXISTS";
-    case 12: return "CIM_ERR_NO_SUCH_PROPERTY";
-    case 13: return "CIM_ERR_TYPE_MISMATCH";
-    case 14: return "CIM_ERR_QUERY_LANGUAGE_NOT_SUPPORTED";
-    case 15: return "CIM_ERR_INVALID_QUERY";
-    case 16: return "CIM_ERR_METHOD_NOT_AVAILABLE";
-    case 17: return "CIM_ERR_METHOD_NOT_FOUND";
-    case 50: return "CMPI_RC_DO_NOT_UNLOAD";
-    case 51: return "CMPI_RC_NEVER_UNLOAD";
-    case 60: return "CMPI_RC_ERR_INVALID_HANDLE";
-    case 61: return "CMPI_RC_ERR_INVALID_DATA_TYPE";
-    case 100: return "CMPI_RC_ERROR_SYSTEM";
-    case 200: return "CMPI_RC_ERROR";
-    default: return "an unknown status code";
+    case 0:
+      return "CIM_ERR_SUCCESS";
+    case 1:
+      return "CIM_ERR_FAILED";
+    case 2:
+      return "CIM_ERR_ACCESS_DENIED";
+    case 3:
+      return "CIM_ERR_INVALID_NAMESPACE";
+    case 4:
+      return "CIM_ERR_INVALID_PARAMETER";
+    case 5:
+      return "CIM_ERR_INVALID_CLASS";
+    case 6:
+      return "CIM_ERR_NOT_FOUND";
+    case 7:
+      return "CIM_ERR_NOT_SUPPORTED";
+    case 8:
+      return "CIM_ERR_CLASS_HAS_CHILDREN";
+    case 9:
+      return "CIM_ERR_CLASS_HAS_INSTANCES";
+    case 10:
+      return "CIM_ERR_INVALID_SUPERCLASS";
+    case 11:
+      return "CIM_ERR_ALREADY_EXISTS";
+    case 12:
+      return "CIM_ERR_NO_SUCH_PROPERTY";
+    case 13:
+      return "CIM_ERR_TYPE_MISMATCH";
+    case 14:
+      return "CIM_ERR_QUERY_LANGUAGE_NOT_SUPPORTED";
+    case 15:
+      return "CIM_ERR_INVALID_QUERY";
+    case 16:
+      return "CIM_ERR_METHOD_NOT_AVAILABLE";
+    case 17:
+      return "CIM_ERR_METHOD_NOT_FOUND";
+    case 50:
+      return "CMPI_RC_DO_NOT_UNLOAD";
+    case 51:
+      return "CMPI_RC_NEVER_UNLOAD";
+    case 60:
+      return "CMPI_RC_ERR_INVALID_HANDLE";
+    case 61:
+      return "CMPI_RC_ERR_INVALID_DATA_TYPE";
+    case 100:
+      return "CMPI_RC_ERROR_SYSTEM";
+    case 200:
+      return "CMPI_RC_ERROR";
+    default:
+      return "an unknown status code";
   }
 }
 

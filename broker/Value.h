@@ -10,8 +10,8 @@
 
 #include "schema/ClassRepository.h"
 
-// What goes into the broker and comes out of it, as plain values: texts in UTF-8, numbers, object paths, instances. They
-// own all that they hold and refer to nothing in a provider or a request; the only pointers are into the class
+// What goes into the broker and comes out of it, as plain values: texts in UTF-8, numbers, object paths, instances.
+// They own all that they hold and refer to nothing in a provider or a request; the only pointers are into the class
 // repository, which outlives them. No locking: a const value may be read by any number of threads.
 
 namespace zorva::broker {
@@ -19,8 +19,8 @@ namespace zorva::broker {
 struct ObjectPath;
 struct Instance;
 
-/// A T on the heap that is copied, compared and moved like the T itself; it lets a value hold its own kind. Never empty,
-/// save after it was moved from, when it may only be assigned to or destroyed.
+/// A T on the heap that is copied, compared and moved like the T itself; it lets a value hold its own kind. Never
+/// empty, save after it was moved from, when it may only be assigned to or destroyed.
 template <class T>
 class Boxed {
  public:
@@ -45,9 +45,9 @@ class Boxed {
   std::unique_ptr<T> value_;
 };
 
-/// One value without its type: std::monostate is null; unsigned types hold std::uint64_t, signed ones std::int64_t, both
-/// real types double; strings and date-times (25 characters, DSP0004 5.2.4) std::string; a reference an ObjectPath; an
-/// embedded object (declared as a string) an Instance.
+/// One value without its type: std::monostate is null; unsigned types hold std::uint64_t, signed ones std::int64_t,
+/// both real types double; strings and date-times (25 characters, DSP0004 5.2.4) std::string; a reference an
+/// ObjectPath; an embedded object (declared as a string) an Instance.
 using Scalar = std::variant<std::monostate, bool, std::uint64_t, std::int64_t, double, char16_t, std::string,
                             Boxed<ObjectPath>, Boxed<Instance>>;
 

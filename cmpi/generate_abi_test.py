@@ -27,7 +27,8 @@ class Facts:
         self.data = json.loads(pathlib.Path(path).read_text())
         self.records = {record["name"]: record for record in self.data["records"]}
         # Version 1.0 lacks these whole types.
-        self.only_200 = {entry["name"] for kind in ("records", "enums") for entry in self.data[kind] if not entry["in_100"]}
+        types = self.data["records"] + self.data["enums"]
+        self.only_200 = {entry["name"] for entry in types if not entry["in_100"]}
         # A macro that names a slot its table lacks means the one that version 2.1 names for it.
         self.slot_mends = {
             (defect["table"], defect["slot"]): defect["in_2_1"]["slot"]
@@ -58,12 +59,10 @@ def quoted(text):
 def records(facts):
     out = []
     for record in facts.data["records"]:
-        name = record["name"]
+        name, kind = record["name"], record["kind"]
         whole = all(field["in_100"] for field in record["fields"])
-        out += guarded(
-            [f"RECORD({name}, {record['kind']} {record['tag']}, {record['kind']}, {record['size']}, {record['align']})"],
-            not whole,
-        )
+        line = f"RECORD({name}, {kind} {record['tag']}, {kind}, {record['size']}, {record['align']})"
+        out += guarded([line], not whole)
         for field in record["fields"]:
             line = f"FIELD({name}, {field['name']}, {field['offset']}, {field['size']}, {field['type']})"
             out += guarded([line], not field["in_100"])
@@ -129,9 +128,8 @@ def fill_tables(facts):
         name = record["name"]
         lines = [f"inline void fill({name}& table) {{"]
         for field in slots:
-            lines += guarded(
-                [f"  table.{field['name']} = Slot<&{name}::{field['name']}>::call;"], not field["in_100"] and record["in_100"]
-            )
+            line = f"  table.{field['name']} = Slot<&{name}::{field['name']}>::call;"
+            lines += guarded([line], not field["in_100"] and record["in_100"])
         lines.append("}")
         out += guarded(lines, not record["in_100"])
     return out
@@ -255,9 +253,9 @@ def function_macros(facts):
     return functions, cases
 
 
-def provider_function(field, name, prefix="static "):
+def provider_function(field, name):
     params = ", ".join(field["param_types"])
-    return f"{prefix}{field['returns']} {name}({params}) {{ return {{CMPI_RC_OK, nullptr}}; }}"
+    return f"static {field['returns']} {name}({params}) {{ return {{CMPI_RC_OK, nullptr}}; }}"
 
 
 def expectations(facts, factory, broker_kind):
@@ -287,65 +285,79 @@ def mi_kind(factory):
     return re.fullmatch(r"<pn>_Create_(\w+)MI", factory["entry_point"]).group(1)
 
 
+def helper_cases(factory):
+    """Checks of a macro that the factories are made of: its text, in the branch that the compiler takes."""
+    name, published = factory["name"], factory["expands_to"]
+    if "!CMPI_VER_100" in factory["requires"]:
+        return [f"WITHDRAWN_HELPER({name})"]
+    if published == "":
+        # These headers name the slots that stay empty with it.
+        text = "NULL,NULL,"
+    else:
+        text = re.sub(r"\s*##\s*", "", published)
+        text = re.sub(r"\b(pfx|pn)(?=[A-Z]|\b)|(?<=base)pn\b", "X", text).replace(" ", "")
+    line = f"HELPER({name}(X), {quoted(text)})"
+    if not factory["requires"]:
+        return [line]
+    conditions = [f"!defined({text[1:]})" if text[0] == "!" else f"defined({text})" for text in factory["requires"]]
+    return [f"#if {' && '.join(conditions)}", line, "#else", f"OTHER_BRANCH({name})", "#endif"]
+
+
+def extension_slots(facts, factory):
+    """The slots that are filled only with CMPI_VER_86: (field, end of the function's name)."""
+    if "trailing_extension_macro" not in factory:
+        return []
+    slots = factory["table_slots_left_zero"]
+    return [(facts.field(factory["table"], slot), f"{slot[0].upper()}{slot[1:]}") for slot in slots]
+
+
+def stub_functions(facts, factory, prefix):
+    """The functions that a CM...MIStub with the prefix expects: (field, name)."""
+    for slot, value in factory["table_slots"].items():
+        field = facts.field(factory["table"], slot)
+        if is_function(field):
+            name = value.replace("CMInstanceMIStubChange(pfx)", "<pfx>ModifyInstance").replace("<pfx>", prefix)
+            yield field, name
+
+
+def factory_check(facts, factory, provider, create):
+    kind = mi_kind(factory)
+    unset = ["  EXPECT_EQ(mi->hdl, nullptr);"] if factory["style"] == "c" else []
+    return [
+        f"inline void check{factory['name']}() {{",
+        f"  {factory['entry_returns']}mi = {create}({provider}_Create_{kind}MI);",
+        "  ASSERT_NE(mi, nullptr);",
+        *unset,
+        *expectations(facts, factory, provider),
+        "}",
+    ]
+
+
 def mi_factories(facts):
     functions, classes, uses, checks, cases = [], {}, [], [], []
     for factory in facts.data["mi_factories"]:
         name, style = factory["name"], factory["style"]
-        conditions = " && ".join(
-            f"!defined({text[1:]})" if text.startswith("!") else f"defined({text})" for text in factory["requires"]
-        )
         if style == "helper":
-            if "!CMPI_VER_100" in factory["requires"]:
-                cases.append(f"WITHDRAWN_HELPER({name})")
-            elif factory["expands_to"] == "":
-                # Nothing in the published form; here the slots are named, and null, which the tables' checks see.
-                cases += [f"#if {conditions}", f"HELPER({name}(X), \"NULL,NULL,\")", "#else", f"OTHER_BRANCH({name})", "#endif"]
-            else:
-                text = re.sub(r"\s*##\s*", "", factory["expands_to"])
-                text = re.sub(r"\b(pfx|pn)(?=[A-Z]|\b)|(?<=base)pn\b", "X", text).replace(" ", "")
-                line = f"HELPER({name}(X), {quoted(text)})"
-                cases += [f"#if {conditions}", line, "#else", f"OTHER_BRANCH({name})", "#endif"] if conditions else [line]
+            cases += helper_cases(factory)
             continue
-        kind, table = mi_kind(factory), factory["table"]
-        extension = [
-            (slot, f"{slot[0].upper()}{slot[1:]}") for slot in factory["table_slots_left_zero"] if "trailing_extension_macro" in factory
-        ]
+        extension = extension_slots(facts, factory)
         if style == "c":
-            for slot, value in factory["table_slots"].items():
-                field = facts.field(table, slot)
-                if is_function(field):
-                    target = value.replace("<pfx>", "Sample").replace("CMInstanceMIStubChange(pfx)", "SampleModifyInstance")
-                    functions.append(provider_function(field, target))
-            if extension:
-                functions.append("#ifdef CMPI_VER_86")
-                functions += [provider_function(facts.field(table, slot), f"Sample{end}") for slot, end in extension]
-                functions.append("#endif")
+            functions += [provider_function(*function) for function in stub_functions(facts, factory, "Sample")]
+            functions.append("#ifdef CMPI_VER_86")
+            functions += [provider_function(field, f"Sample{end}") for field, end in extension]
+            functions.append("#endif")
             uses.append(f"{name}(Sample, SampleProvider, sampleBroker, ++sampleHooks)")
-            checks += [
-                f"inline void check{name}() {{",
-                f"  {factory['entry_returns']}mi = createSample(SampleProvider_Create_{kind}MI);",
-                "  ASSERT_NE(mi, nullptr);",
-                "  EXPECT_EQ(mi->hdl, nullptr);",
-                *expectations(facts, factory, "SampleProvider"),
-                "}",
-            ]
+            checks += factory_check(facts, factory, "SampleProvider", "createSample")
         else:
-            own = f"Cmpi{kind}MI"
+            own = f"Cmpi{mi_kind(factory)}MI"
             for slot, value in factory["table_slots"].items():
-                field = facts.field(table, slot)
+                field = facts.field(factory["table"], slot)
                 if is_function(field):
                     owner, _, target = value.partition("::")
                     classes.setdefault(owner, []).append(provider_function(field, target))
-            for slot, end in extension:
-                classes[own].append(provider_function(facts.field(table, slot), f"drive{end}"))
+            classes[own] += [provider_function(field, f"drive{end}") for field, end in extension]
             uses.append(f"{name}(ClassProvider<{own}>, ClassProvider)")
-            checks += [
-                f"inline void check{name}() {{",
-                f"  {factory['entry_returns']}mi = createOfClass(ClassProvider_Create_{kind}MI);",
-                "  ASSERT_NE(mi, nullptr);",
-                *expectations(facts, factory, "ClassProvider"),
-                "}",
-            ]
+            checks += factory_check(facts, factory, "ClassProvider", "createOfClass")
         cases.append(f"CASE({name}, check{name})")
     return functions, classes, uses, checks, cases
 
@@ -361,25 +373,33 @@ def c_provider_function(field, name):
     return f"static {field['returns']} {name}({params}) {{ {ignored} CMReturn(CMPI_RC_OK); }}"
 
 
-def c_source(facts):
-    """A C program's view: sizes, offsets, types, enumerators, every macro that calls, every stub."""
+def c_assert(condition, what):
+    return f"_Static_assert({condition}, {quoted(what)});"
+
+
+def c_layout(facts):
+    """Sizes, offsets, types, enumerators and constants, checked by a C compiler."""
     out = []
     for record in facts.data["records"]:
         name = record["name"]
-        out.append(f"_Static_assert(sizeof({name}) == {record['size']}, \"size of {name}\");")
+        out.append(c_assert(f"sizeof({name}) == {record['size']}", f"size of {name}"))
         for field in record["fields"]:
             member = f"{name}.{field['name']}"
-            out.append(f"_Static_assert(offsetof({name}, {field['name']}) == {field['offset']}, \"offset of {member}\");")
-            pointer = c_pointer_to(field["type"])
-            out.append(
-                f"_Static_assert(_Generic(&(({name}*)0)->{field['name']}, {pointer}: 1, default: 0), \"type of {member}\");"
-            )
+            out.append(c_assert(f"offsetof({name}, {field['name']}) == {field['offset']}", f"offset of {member}"))
+            of_type = f"_Generic(&(({name}*)0)->{field['name']}, {c_pointer_to(field['type'])}: 1, default: 0)"
+            out.append(c_assert(of_type, f"type of {member}"))
     for enum in facts.data["enums"]:
         for value in enum["values"]:
-            out.append(f"_Static_assert({value['name']} == {value['value']}, \"value of {value['name']}\");")
+            out.append(c_assert(f"{value['name']} == {value['value']}", f"value of {value['name']}"))
     for constant in facts.data["constants"]:
         if constant["active"] and "value" in constant:
-            out.append(f"_Static_assert({constant['name']} == {constant['value']}, \"value of {constant['name']}\");")
+            out.append(c_assert(f"{constant['name']} == {constant['value']}", f"value of {constant['name']}"))
+    return out
+
+
+def c_macros(facts):
+    """A C function around each macro that calls a slot."""
+    out = []
     for macro in facts.data["function_macros"]:
         name, call = macro["name"], (macro.get("calls") or [{}])[0]
         if macro["kind"] != "table-call" or (name, len(macro["params"])) in WITHDRAWN:
@@ -401,25 +421,29 @@ def c_source(facts):
             label = f"cUses{name}{suffix}"
             out.append(f"void {label}({', '.join(params)});")
             out.append(f"void {label}({', '.join(params)}) {{ (void){name}({', '.join(passed)}); }}")
+    return out
+
+
+def c_stubs(facts):
+    """A provider in C made with each CM...MIStub."""
+    out = []
     for factory in facts.data["mi_factories"]:
         if factory["style"] != "c":
             continue
-        for slot, value in factory["table_slots"].items():
-            field = facts.field(factory["table"], slot)
-            if is_function(field):
-                target = value.replace("<pfx>", "C").replace("CMInstanceMIStubChange(pfx)", "CModifyInstance")
-                out.append(c_provider_function(field, target))
-        if "trailing_extension_macro" in factory:
-            slots = [(facts.field(factory["table"], slot), slot) for slot in factory["table_slots_left_zero"]]
-            out.append("#ifdef CMPI_VER_86")
-            out += [c_provider_function(field, f"C{slot[0].upper()}{slot[1:]}") for field, slot in slots]
-            out.append("#endif")
+        out += [c_provider_function(*function) for function in stub_functions(facts, factory, "C")]
+        out.append("#ifdef CMPI_VER_86")
+        out += [c_provider_function(field, f"C{end}") for field, end in extension_slots(facts, factory)]
+        out.append("#endif")
         out.append(f"{factory['name']}(C, CProvider, cBroker, CMNoHook)")
     return out
 
 
 def counts(facts):
-    return [f"constexpr int k{''.join(part.title() for part in key.split('_'))} = {value};" for key, value in facts.data["counts"].items()]
+    out = []
+    for key, value in facts.data["counts"].items():
+        name = "".join(part.title() for part in key.split("_"))
+        out.append(f"constexpr int k{name} = {value};")
+    return out
 
 
 def main():
@@ -447,7 +471,7 @@ def main():
         "abi_factory_uses.inc": uses,
         "abi_factory_checks.inc": factory_checks,
         "abi_factory_cases.inc": factory_cases,
-        "abi_c.inc": c_source(facts),
+        "abi_c.inc": c_layout(facts) + c_macros(facts) + c_stubs(facts),
     }
     for name, lines in files.items():
         (folder / name).write_text("\n".join(lines) + "\n")

@@ -77,12 +77,14 @@ class Platforms(unittest.TestCase):
                 self.assertIn("no platform chosen", result.stderr)
 
     def test_every_constant_without_a_value_has_its_text_where_it_applies(self):
-        configurations = list(
-            itertools.product(
-                ("c", "c++"),
-                [(PLATFORM,), (PLATFORM, "CMPI_VER_86"), ("CMPI_PLATFORM_WIN32_IX86_MSVC",), ("CMPI_PLATFORM_ZOS_ZSERIES_IBM",), ("CMPI_PLATFORM_HPUX_ACC",)],
-            )
-        )
+        defines = [
+            (PLATFORM,),
+            (PLATFORM, "CMPI_VER_86"),
+            ("CMPI_PLATFORM_WIN32_IX86_MSVC",),
+            ("CMPI_PLATFORM_ZOS_ZSERIES_IBM",),
+            ("CMPI_PLATFORM_HPUX_ACC",),
+        ]
+        configurations = list(itertools.product(("c", "c++"), defines))
         checked = 0
         for constant in FACTS["constants"]:
             name = constant["name"]
@@ -121,7 +123,8 @@ class Versions(unittest.TestCase):
     def test_another_version_is_an_error_that_says_so(self):
         for version in ("210", "90", "0"):
             with self.subTest(version):
-                result = run("c", '#include "cmpidt.h"\n', "-fsyntax-only", f"-D{PLATFORM}", f"-DCMPI_VERSION={version}")
+                options = ["-fsyntax-only", f"-D{PLATFORM}", f"-DCMPI_VERSION={version}"]
+                result = run("c", '#include "cmpidt.h"\n', *options)
                 self.assertNotEqual(result.returncode, 0)
                 self.assertIn("CMPI_VERSION must be 100 or 200", result.stderr)
 

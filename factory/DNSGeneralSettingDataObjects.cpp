@@ -49,7 +49,7 @@ unsigned short getAllDNSGeneralSettingDataCMPIObjectPaths(const CMPIBroker* brok
   unsigned short failed = 0;
   DNSGeneralSettingData data;
   if (data) {
-    CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, status), dnsGeneralSettingDataClass, nullptr);
+    CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, nullptr), dnsGeneralSettingDataClass, nullptr);
     if (isGood(path)) {
       addTextKey(path, "InstanceID", generalInstanceID());
       paths->push_back(path);
@@ -69,7 +69,7 @@ CMPIInstance* makeDNSGeneralSettingDataInstance(const CMPIBroker* broker, const 
            " isObjPath=", isObjPath, " status=", status);
   const WantedProperties wanted(properties, isObjPath);
 
-  CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, status), dnsGeneralSettingDataClass, nullptr);
+  CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, nullptr), dnsGeneralSettingDataClass, nullptr);
   if (!isGood(path)) return nullptr;
   CMPIInstance* instance = newInstance(broker, path, nullptr);
   if (!isGood(instance)) return instance;

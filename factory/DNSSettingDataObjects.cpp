@@ -13,9 +13,8 @@ unsigned short getAllDNSSettingDataCMPIObjectPaths(const CMPIBroker* broker, con
                                                    std::vector<CMPIObjectPath*>* paths, CMPIStatus* status) {
   logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " paths=", paths, " status=", status);
   unsigned short failed = 0;
-  const std::string nameSpace = nameSpaceOf(ref, status);
   for (DNSSettingData data; data; ++data) {
-    CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsSettingDataClass, nullptr);
+    CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, nullptr), dnsSettingDataClass, nullptr);
     if (!isGood(path)) {
       logError(loggerDNSObjFactory, ZV_HERE, "getAllDNSSettingDataCMPIObjectPaths failed");
       failed = 1;
@@ -70,7 +69,7 @@ CMPIInstance* makeDNSSettingDataInstance(const CMPIBroker* broker, const CMPIObj
            " isObjPath=", isObjPath, " status=", status);
   const WantedProperties wanted(properties, isObjPath);
 
-  CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, status), dnsSettingDataClass, nullptr);
+  CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, nullptr), dnsSettingDataClass, nullptr);
   if (!isGood(path)) return nullptr;
   CMPIInstance* instance = newInstance(broker, path, nullptr);
   if (!isGood(instance)) return instance;

@@ -3,8 +3,8 @@
 
     extract_facts.py SCHEMA_DIR > cim-facts.json
 
-SCHEMA_DIR holds DMTF's CIM Schema as MOF, one class to a file. Of each class the facts are its superclass, whether it is
-abstract or an association, its properties (type, array, key, class of a reference) and its methods (return type,
+SCHEMA_DIR holds DMTF's CIM Schema as MOF, one class to a file. Of each class the facts are its superclass, whether it
+is abstract or an association, its properties (type, array, key, class of a reference) and its methods (return type,
 parameters with their types). Names and types only; no text of the schema goes into the output.
 
 This reader is on purpose none of the project's own: a test reads the same files with schema/Mof.h and compares.

@@ -9,9 +9,9 @@
 
 namespace {
 
+using zorvagent::testing::TemporaryDirectory;
 using ZV::make_wstring;
 using ZV::PropertyFile;
-using zorvagent::testing::TemporaryDirectory;
 
 class PropertyFileTest : public ::testing::Test {
  protected:

@@ -64,8 +64,8 @@ TEST(ResolvConf, WhatIsNoAddressIsPassedOver) {
 }
 
 TEST(ResolvConf, MoreThanThreeServersAreAllListed) {
-  EXPECT_EQ(serversIn("nameserver 192.0.2.1\nnameserver 192.0.2.2\nnameserver 192.0.2.3\nnameserver 192.0.2.4\n").size(),
-            4U);
+  EXPECT_EQ(
+      serversIn("nameserver 192.0.2.1\nnameserver 192.0.2.2\nnameserver 192.0.2.3\nnameserver 192.0.2.4\n").size(), 4U);
 }
 
 TEST(ResolvConf, TheLocalStubIsKnownWhereItStandsAlone) {

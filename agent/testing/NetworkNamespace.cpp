@@ -51,7 +51,9 @@ bool enterNewNetwork() {
   return ::unshare(CLONE_NEWUSER | CLONE_NEWNET) == 0;
 }
 
-bool canMakeNetworks() { return succeedsInChild([] { return enterNewNetwork(); }); }
+bool canMakeNetworks() {
+  return succeedsInChild([] { return enterNewNetwork(); });
+}
 
 Interfaces::Interfaces() : socket_(::mnl_socket_open2(NETLINK_ROUTE, SOCK_CLOEXEC), &::mnl_socket_close) {
   if (socket_ == nullptr || ::mnl_socket_bind(socket_.get(), 0, MNL_SOCKET_AUTOPID) != 0) {
@@ -68,14 +70,39 @@ void Interfaces::send(nlmsghdr* message, const char* what) {
   }
 }
 
-void Interfaces::addBridge(const std::string& name) {
+void Interfaces::addBridge(const std::string& name, unsigned int group) {
   Message message(RTM_NEWLINK, NLM_F_CREATE | NLM_F_EXCL);
   message.header<ifinfomsg>()->ifi_family = AF_UNSPEC;
   ::mnl_attr_put_strz(message, IFLA_IFNAME, name.c_str());
   nlattr* info = ::mnl_attr_nest_start(message, IFLA_LINKINFO);
   ::mnl_attr_put_strz(message, IFLA_INFO_KIND, "bridge");
   ::mnl_attr_nest_end(message, info);
+  if (group != 0) ::mnl_attr_put_u32(message, IFLA_GROUP, group);
   send(message, "a bridge cannot be made");
+}
+
+void Interfaces::addPair(const std::string& name, const std::string& other) {
+  constexpr unsigned short kPeer = 1;  // VETH_INFO_PEER
+  Message message(RTM_NEWLINK, NLM_F_CREATE | NLM_F_EXCL);
+  message.header<ifinfomsg>()->ifi_family = AF_UNSPEC;
+  ::mnl_attr_put_strz(message, IFLA_IFNAME, name.c_str());
+  nlattr* info = ::mnl_attr_nest_start(message, IFLA_LINKINFO);
+  ::mnl_attr_put_strz(message, IFLA_INFO_KIND, "veth");
+  nlattr* data = ::mnl_attr_nest_start(message, IFLA_INFO_DATA);
+  nlattr* peer = ::mnl_attr_nest_start(message, kPeer);
+  message.header<ifinfomsg>()->ifi_family = AF_UNSPEC;
+  ::mnl_attr_put_strz(message, IFLA_IFNAME, other.c_str());
+  ::mnl_attr_nest_end(message, peer);
+  ::mnl_attr_nest_end(message, data);
+  ::mnl_attr_nest_end(message, info);
+  send(message, "a pair of links cannot be made");
+}
+
+void Interfaces::removeGroup(unsigned int group) {
+  Message message(RTM_DELLINK, 0);
+  message.header<ifinfomsg>()->ifi_family = AF_UNSPEC;
+  ::mnl_attr_put_u32(message, IFLA_GROUP, group);
+  send(message, "a group of links cannot be removed");
 }
 
 void Interfaces::remove(const std::string& name) {

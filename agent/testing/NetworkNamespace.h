@@ -21,8 +21,12 @@ class Interfaces {
  public:
   Interfaces();
 
-  void addBridge(const std::string& name);
+  // A group is a number by which links are removed together, which is far quicker than one by one; 0 is none.
+  void addBridge(const std::string& name, unsigned int group = 0);
+  // Two ends of a cable: each has carrier while the other one is up.
+  void addPair(const std::string& name, const std::string& other);
   void remove(const std::string& name);
+  void removeGroup(unsigned int group);
   void rename(const std::string& from, const std::string& to);
   void setUp(const std::string& name, bool up);
   // flags are those of IFA_FLAGS; validSeconds 0 means for ever.

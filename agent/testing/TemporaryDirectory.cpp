@@ -11,8 +11,11 @@ namespace zorvagent::testing {
 
 namespace fs = std::filesystem;
 
-TemporaryDirectory::TemporaryDirectory() {
-  std::string pattern = fs::temp_directory_path() / "zorvagent-XXXXXX";
+TemporaryDirectory::TemporaryDirectory() : TemporaryDirectory(fs::temp_directory_path().string()) {}
+
+TemporaryDirectory::TemporaryDirectory(const std::string& where) {
+  const fs::path base = fs::is_directory(where) ? fs::path(where) : fs::temp_directory_path();
+  std::string pattern = base / "zorvagent-XXXXXX";
   if (::mkdtemp(pattern.data()) == nullptr) throw std::runtime_error("no temporary directory can be made");
   path_ = pattern + '/';
 }

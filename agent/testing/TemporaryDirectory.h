@@ -9,6 +9,8 @@ namespace zorvagent::testing {
 class TemporaryDirectory {
  public:
   TemporaryDirectory();
+  // In a directory of the caller's choice, if that is there.
+  explicit TemporaryDirectory(const std::string& where);
   ~TemporaryDirectory();
   TemporaryDirectory(const TemporaryDirectory&) = delete;
   TemporaryDirectory& operator=(const TemporaryDirectory&) = delete;

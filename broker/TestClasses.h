@@ -1,0 +1,63 @@
+#pragma once
+
+#include <memory>
+#include <stdexcept>
+
+#include "schema/ClassRepository.h"
+#include "schema/Mof.h"
+
+// The classes that TestProvider.cpp serves, for the tests of this folder.
+
+namespace zorva::broker::testing {
+
+inline constexpr const char* kTestClasses = R"mof(
+Qualifier Key : boolean = false, Scope(property, reference), Flavor(DisableOverride, ToSubclass);
+Qualifier Abstract : boolean = false, Scope(class, association, indication), Flavor(EnableOverride, Restricted);
+Qualifier Association : boolean = false, Scope(association), Flavor(DisableOverride, ToSubclass);
+Qualifier Override : string = null, Scope(property, reference, method), Flavor(EnableOverride, Restricted);
+Qualifier EmbeddedInstance : string = null, Scope(property, method, parameter);
+Qualifier Description : string = null, Scope(any), Flavor(EnableOverride, ToSubclass, Translatable);
+Qualifier MaxLen : uint32 = null, Scope(property, method, parameter);
+Qualifier Values : string[], Scope(property, method, parameter), Flavor(EnableOverride, ToSubclass, Translatable);
+Qualifier In : boolean = true, Scope(parameter), Flavor(DisableOverride, ToSubclass);
+Qualifier Out : boolean = false, Scope(parameter), Flavor(DisableOverride, ToSubclass);
+
+[Abstract] class T_Base { [Key, MaxLen(64)] string Name; };
+
+[Description("A thing")] class T_Thing : T_Base {
+  [Values {"small", "large"}] uint16 Size;
+  string Labels[];
+  boolean Good; char16 Letter; datetime Since;
+  uint8 Tiny; sint8 STiny; sint16 SSmall; uint32 Wide; sint32 SWide; uint64 Huge; sint64 SHuge;
+  real32 Rough; real64 Ratio;
+  uint16 Numbers[];
+  [EmbeddedInstance("T_Thing")] string Inner;
+  [Description("Says it again")] uint32 Echo([In, Description("What")] string Text, [In] uint16 Times,
+                                             [In(false), Out] string Said, [In] T_Thing REF Target);
+};
+class T_SpecialThing : T_Thing { string Extra; };
+class T_Other : T_Base { string Note; };
+class T_Trouble : T_Base { string Note; };
+class T_Calling : T_Base { string Note; };
+class T_Absent : T_Base { string Note; };
+class T_Unserved : T_Base { string Note; };
+class T_Two { [Key] string First; [Key] uint32 Second; string Note; };
+class T_Keyless { string Note; };
+
+[Association, Abstract] class T_Link { [Key] T_Base REF Left; [Key] T_Base REF Right; };
+[Association] class T_ThingOther : T_Link {
+  [Override("Left")] T_Thing REF Left; [Override("Right")] T_Other REF Right; uint16 Rank; };
+[Association] class T_ThingTrouble : T_Link {
+  [Override("Left")] T_Thing REF Left; [Override("Right")] T_Trouble REF Right; };
+[Association] class T_ThingAbsent : T_Link {
+  [Override("Left")] T_Thing REF Left; [Override("Right")] T_Absent REF Right; };
+)mof";
+
+inline std::shared_ptr<const schema::ClassRepository> testClasses() {
+  auto repository = std::make_shared<schema::ClassRepository>();
+  schema::RepositorySink sink(*repository);
+  if (const auto error = schema::parseMof(kTestClasses, "test.mof", sink)) throw std::runtime_error(error->text());
+  return repository;
+}
+
+}  // namespace zorva::broker::testing

@@ -1,0 +1,25 @@
+// An object of the host as the companion providers publish it: a class name and properties in order, the keys first.
+#pragma once
+
+#include <cstdint>
+#include <string>
+#include <variant>
+#include <vector>
+
+namespace zorva::host {
+
+using PropertyValue =
+    std::variant<std::string, std::uint8_t, std::uint16_t, std::vector<std::string>, std::vector<std::uint16_t>>;
+
+struct HostProperty {
+  const char* name;
+  PropertyValue value;
+};
+
+struct HostObject {
+  const char* className;
+  std::vector<HostProperty> keys;        // texts all of them
+  std::vector<HostProperty> properties;  // without the keys
+};
+
+}  // namespace zorva::host

@@ -1,0 +1,231 @@
+#include "host/HostObjects.h"
+
+#include <systemd/sd-id128.h>
+
+#include <array>
+#include <fstream>
+#include <set>
+
+#include "host/SubnetMask.h"
+
+namespace zorva::host {
+
+using zorvagent::AddressFamily;
+using zorvagent::AddressOrigin;
+using zorvagent::InterfaceAddress;
+using zorvagent::Node;
+using zorvagent::NodeType;
+using zorvagent::TreeSnapshot;
+
+namespace {
+
+constexpr const char* kComputerSystemClass = "ZORVA_ComputerSystem";
+constexpr const char* kServiceProcessorClass = "ZORVA_SPComputerSystem";
+constexpr const char* kIPEndpointClass = "ZORVA_IPProtocolEndpoint";
+constexpr const char* kIPAssignmentClass = "ZORVA_IPAssignmentSettingData";
+constexpr const char* kServiceProcessorName = "BMC:-1";
+
+// Values of CIM's enumerations.
+constexpr std::uint16_t kEnabled = 2;
+constexpr std::uint16_t kDisabled = 3;
+constexpr std::uint16_t kNotApplicable = 5;
+constexpr std::uint16_t kEnabledButOffline = 6;
+constexpr std::uint16_t kRequestNotApplicable = 12;
+constexpr std::uint16_t kStatusUnknown = 0;
+constexpr std::uint16_t kStatusOk = 2;
+constexpr std::uint16_t kNotDedicated = 0;
+constexpr std::uint16_t kManagementController = 28;
+constexpr std::uint16_t kIPv4 = 4096;
+constexpr std::uint16_t kIPv6 = 4097;
+
+// The first line of a small file; empty where it cannot be read.
+std::string firstLine(const char* path) {
+  std::ifstream file(path);
+  std::string line;
+  std::getline(file, line);
+  const std::size_t end = line.find_last_not_of(" \t\r");
+  return end == std::string::npos ? "" : line.substr(0, end + 1);
+}
+
+// A name for this machine that is the same at every start and tells nothing of the machine's id, which must not leave
+// the host; empty where the machine has no id.
+std::string machineName() {
+  constexpr sd_id128_t kApplication = SD_ID128_MAKE(5c, 3b, 0e, 8d, 2a, 94, 4f, 61, 9d, 77, 1b, c8, 40, e6, 52, 9f);
+  sd_id128_t id;
+  if (sd_id128_get_machine_app_specific(kApplication, &id) < 0) return {};
+  std::array<char, SD_ID128_STRING_MAX> text{};
+  return sd_id128_to_string(id, text.data());
+}
+
+HostObject hostSystem(const std::string& name) {
+  std::vector<std::string> identifiers;
+  std::vector<std::string> descriptions;
+  const auto identify = [&](const std::string& value, const char* what) {
+    if (value.empty()) return;
+    identifiers.push_back(value);
+    descriptions.emplace_back(what);
+  };
+  identify(firstLine("/sys/class/dmi/id/product_serial"), "Serial number of the system (SMBIOS)");
+  identify(machineName(), "Hash of the machine id");
+  return {kComputerSystemClass,
+          {{"CreationClassName", std::string(kComputerSystemClass)}, {"Name", name}},
+          {{"NameFormat", std::string("IP")},
+           {"ElementName", name},
+           {"Caption", std::string("Computer system")},
+           {"EnabledState", kEnabled},
+           {"RequestedState", kRequestNotApplicable},
+           {"OperationalStatus", std::vector<std::uint16_t>{kStatusOk}},
+           {"Dedicated", std::vector<std::uint16_t>{kNotDedicated}},
+           {"OtherIdentifyingInfo", identifiers},
+           {"IdentifyingDescriptions", descriptions}}};
+}
+
+HostObject serviceProcessor() {
+  return {kServiceProcessorClass,
+          {{"CreationClassName", std::string(kServiceProcessorClass)}, {"Name", std::string(kServiceProcessorName)}},
+          {{"NameFormat", std::string("Other")},
+           {"ElementName", std::string("Service processor")},
+           {"Caption", std::string("Service processor")},
+           {"EnabledState", kNotApplicable},
+           {"RequestedState", kRequestNotApplicable},
+           {"OperationalStatus", std::vector<std::uint16_t>{kStatusUnknown}},
+           {"Dedicated", std::vector<std::uint16_t>{kManagementController}}}};
+}
+
+// One interface of the tree and where it belongs.
+struct Interface {
+  const Node& config;
+  std::string name;
+  bool onServiceProcessor;
+};
+
+// Every interface in tree order. What has no name is known by that of its port.
+std::vector<Interface> interfaces(const TreeSnapshot& tree) {
+  std::vector<Interface> found;
+  for (const Node* node = tree.nextOfType(NodeType::NetworkIPConfig, 0); node != nullptr;
+       node = tree.nextOfType(NodeType::NetworkIPConfig, node->index() + 1)) {
+    const Node& port = tree.parent(*node);
+    const std::string* name = node->text(ZV::NodeLexicon::PROP_NAME);
+    found.push_back({*node, name != nullptr ? *name : port.name(), tree.parent(port).isServiceProcessor()});
+  }
+  return found;
+}
+
+std::uint16_t enabledState(const Node& config) {
+  const unsigned int* state = config.number(ZV::NodeLexicon::PROP_ENABLED_STATE);
+  if (state == nullptr) return kNotApplicable;
+  switch (*state) {
+    case 1:
+      return kEnabled;
+    case 12:
+      return kEnabledButOffline;
+    case 16:
+      return kDisabled;
+    default:
+      return kNotApplicable;
+  }
+}
+
+std::uint16_t addressOrigin(const InterfaceAddress& address) {
+  const bool isIPv4 = address.family() == AddressFamily::IPv4;
+  switch (address.origin) {
+    case AddressOrigin::Static:
+      return 3;
+    case AddressOrigin::Dhcp:
+      return isIPv4 ? 4 : 7;
+    case AddressOrigin::Slaac:
+      return 8;
+    case AddressOrigin::LinkLocal:
+      return isIPv4 ? 6 : 10;
+    case AddressOrigin::Unknown:
+      break;
+  }
+  return 0;
+}
+
+HostObject ipEndpoint(const Interface& interface, const InterfaceAddress& address, const std::string& name,
+                      const std::string& systemName) {
+  HostObject object{kIPEndpointClass,
+                    {{"SystemCreationClassName",
+                      std::string(interface.onServiceProcessor ? kServiceProcessorClass : kComputerSystemClass)},
+                     {"CreationClassName", std::string(kIPEndpointClass)},
+                     {"SystemName", interface.onServiceProcessor ? std::string(kServiceProcessorName) : systemName},
+                     {"Name", name}},
+                    {{"ElementName", name},
+                     {"Caption", "IP endpoint of " + interface.name},
+                     {"NameFormat", std::string("NICName")},
+                     {"AddressOrigin", addressOrigin(address)},
+                     {"EnabledState", enabledState(interface.config)},
+                     {"RequestedState", kRequestNotApplicable}}};
+  if (address.family() == AddressFamily::IPv4) {
+    object.properties.push_back({"ProtocolIFType", kIPv4});
+    object.properties.push_back({"IPv4Address", address.address});
+    object.properties.push_back({"SubnetMask", subnetMask(address.prefixLength)});
+  } else {
+    object.properties.push_back({"ProtocolIFType", kIPv6});
+    object.properties.push_back({"IPv6Address", address.address});
+    object.properties.push_back({"PrefixLength", static_cast<std::uint8_t>(address.prefixLength)});
+    object.properties.push_back({"IPv6SubnetPrefixLength", static_cast<std::uint16_t>(address.prefixLength)});
+  }
+  return object;
+}
+
+HostObject ipAssignment(const std::string& instanceID, const Interface& interface, const InterfaceAddress& address) {
+  const bool isIPv4 = address.family() == AddressFamily::IPv4;
+  return {kIPAssignmentClass,
+          {{"InstanceID", instanceID}},
+          {{"ElementName", interface.name + (isIPv4 ? " IPv4" : " IPv6")},
+           {"Caption", std::string("IP assignment")},
+           {"AddressOrigin", addressOrigin(address)},
+           {"ProtocolIFType", isIPv4 ? kIPv4 : kIPv6}}};
+}
+
+}  // namespace
+
+std::vector<HostObject> computerSystems(const TreeSnapshot& tree) {
+  std::vector<HostObject> objects = {hostSystem(tree.systemName())};
+  for (const Node& node : tree.nodes()) {
+    if (!node.isServiceProcessor()) continue;
+    objects.push_back(serviceProcessor());
+    break;  // several would share one name
+  }
+  return objects;
+}
+
+std::vector<HostObject> ipEndpoints(const TreeSnapshot& tree) {
+  const std::vector<Interface> all = interfaces(tree);
+  std::set<std::string> names;
+  for (const Interface& interface : all) names.insert(interface.name);
+
+  std::vector<HostObject> objects;
+  std::set<std::string> begun;  // interfaces whose first address has the plain name
+  for (const Interface& interface : all) {
+    unsigned int ordinal = 1;
+    for (const InterfaceAddress& address : interface.config.addresses()) {
+      std::string name = interface.name;
+      if (!begun.insert(interface.name).second) {
+        do {
+          name = interface.name + "_" + std::to_string(++ordinal);
+        } while (!names.insert(name).second);
+      }
+      objects.push_back(ipEndpoint(interface, address, name, tree.systemName()));
+    }
+  }
+  return objects;
+}
+
+std::vector<HostObject> ipAssignments(const TreeSnapshot& tree) {
+  std::vector<HostObject> objects;
+  std::set<std::string> known;
+  for (const Interface& interface : interfaces(tree)) {
+    const std::string prefix = (interface.onServiceProcessor ? "BMC%" : "Computer%") + interface.name;
+    for (const InterfaceAddress& address : interface.config.addresses()) {
+      const std::string instanceID = prefix + (address.family() == AddressFamily::IPv4 ? "%ipv4" : "%ipv6");
+      // The first address of each version tells the origin.
+      if (known.insert(instanceID).second) objects.push_back(ipAssignment(instanceID, interface, address));
+    }
+  }
+  return objects;
+}
+
+}  // namespace zorva::host

@@ -1,0 +1,32 @@
+// The instance operations that the companion providers share: they publish objects, and refuse to change them.
+#pragma once
+
+#include <cmpidt.h>
+
+#include <functional>
+#include <vector>
+
+#include "agent/tree/TreeSnapshot.h"
+#include "host/HostObject.h"
+
+namespace zorva::host {
+
+// What a provider publishes of the host as it is.
+using Publish = std::vector<HostObject> (*)(const zorvagent::TreeSnapshot& tree);
+
+// Each reads the host afresh and hands out the objects of the class that ref names. rc CMPI_RC_ERR_FAILED, with the
+// reason, where the host cannot be read; no exception leaves them. Thread-safe.
+CMPIStatus enumerateInstanceNames(const CMPIBroker* broker, Publish publish, const CMPIResult* result,
+                                  const CMPIObjectPath* ref);
+CMPIStatus enumerateInstances(const CMPIBroker* broker, Publish publish, const CMPIResult* result,
+                              const CMPIObjectPath* ref, const char** properties);
+
+// The object that has all the keys of ref and no others: names of classes in any case, other values exactly. rc
+// CMPI_RC_ERR_NOT_FOUND, with the reason, where there is none.
+CMPIStatus getInstance(const CMPIBroker* broker, Publish publish, const CMPIResult* result, const CMPIObjectPath* ref,
+                       const char** properties);
+
+// rc CMPI_RC_ERR_NOT_SUPPORTED, with a text that says what the client asked for.
+CMPIStatus refuse(const CMPIBroker* broker, const char* operation);
+
+}  // namespace zorva::host

@@ -1,0 +1,89 @@
+# What ./run and ./test share: one clear sentence when something is wrong, packages, room on the disk, building.
+# Sourced by them with the checkout as the working directory.
+
+# What the program needs to be built, and what the tests need besides.
+build_packages=(g++ cmake ninja-build pkg-config python3-minimal libspdlog-dev libfmt-dev nlohmann-json3-dev
+  libtomlplusplus-dev libcli11-dev libmnl-dev libsystemd-dev)
+test_packages=(libgtest-dev libgmock-dev binutils iproute2 libxml2-utils)
+bench_packages=(libbenchmark-dev iproute2 python3-minimal)
+
+die() {
+  printf '%s: %s\n' "${0##*/}" "$*" >&2
+  exit 1
+}
+
+# need_room MEGABYTES: stops where the checkout's disk has less left.
+need_room() {
+  local free
+  free=$(df --output=avail -m . 2>/dev/null | tail -n 1 | tr -d ' ')
+  if [ -n "$free" ] && [ "$free" -lt "$1" ]; then
+    die "building needs $1 MB of free disk space here and only $free MB are left; free some or move the checkout"
+  fi
+}
+
+missing_packages() {
+  local package
+  for package in "$@"; do
+    [ "$(dpkg-query -W -f '${db:Status-Status}' "$package" 2>/dev/null)" = installed ] || printf '%s ' "$package"
+  done
+}
+
+# need_packages PACKAGE...: installs those that are missing, with apt-get.
+need_packages() {
+  command -v dpkg-query >/dev/null || die "this needs Debian 12 or a system like it: there is no dpkg here to install packages with"
+  local missing as_root=() log=build/apt.log
+  missing=$(missing_packages "$@")
+  [ -n "$missing" ] || return 0
+  if [ "$(id -u)" -ne 0 ]; then
+    command -v sudo >/dev/null && sudo -v 2>/dev/null ||
+      die "these packages are missing and installing them needs root: run 'apt-get install $missing' as root, then this again"
+    as_root=(sudo)
+  fi
+  need_room 1500
+  mkdir -p build || die "cannot write to $PWD"
+  printf 'Installing %s\n' "$missing" >&2
+  local install=("${as_root[@]}" env DEBIAN_FRONTEND=noninteractive apt-get install -y -q --no-install-recommends)
+  # shellcheck disable=SC2086  # the list is words
+  if ! "${install[@]}" $missing >"$log" 2>&1; then
+    "${as_root[@]}" apt-get update -q >>"$log" 2>&1
+    # shellcheck disable=SC2086
+    "${install[@]}" $missing >>"$log" 2>&1 ||
+      die "apt-get could not install ${missing% }: is this machine connected to a package mirror? ($(grep -m1 '^E:' "$log" || echo "see $log"); all of it is in $log)"
+  fi
+}
+
+# build PRESET [TARGET...]: configures once and builds what is not up to date; quiet where there is nothing to do.
+build() {
+  local preset=$1 log
+  shift
+  log=build/$preset.log
+  mkdir -p build/"$preset" || die "cannot write to $PWD/build"
+  # One build of a preset at a time: two would spoil each other's files.
+  exec 9>build/"$preset".lock
+  flock 9
+  if [ ! -f build/"$preset"/build.ninja ]; then
+    need_room 1500
+    printf 'Configuring %s\n' "$preset" >&2
+    cmake --preset "$preset" >"$log" 2>&1 ||
+      die "configuring failed: $(grep -m1 -A2 'CMake Error' "$log" | tail -n 1 || true) (all of it is in $log)"
+  fi
+  if [ "$(ninja -C build/"$preset" -n "$@" 2>/dev/null | tail -n 1)" != 'ninja: no work to do.' ]; then
+    need_room 1000
+    printf 'Building %s (the first time takes some minutes)\n' "$preset" >&2
+    if [ -t 2 ]; then
+      ninja -C build/"$preset" "$@" 2>&1 | tee "$log" | sed -un 's/^\(\[[0-9/]*\]\).*/\r\1 /p' | tr -d '\n' >&2
+      [ "${PIPESTATUS[0]}" -eq 0 ] || build_failed "$log"
+      printf '\n' >&2
+    else
+      ninja -C build/"$preset" "$@" >"$log" 2>&1 || build_failed "$log"
+    fi
+  fi
+  exec 9>&-
+}
+
+build_failed() {
+  if grep -q 'No space left on device' "$1"; then die "the disk is full: free some space and run this again"; fi
+  printf '\n' >&2
+  grep -m5 -E 'error:|FAILED:|undefined reference|fatal' "$1" >&2
+  die "building failed; all of it is in $1"
+}
