@@ -75,7 +75,8 @@ class Arena {
   struct Block {
     Block* previous;
   };
-  static constexpr std::size_t kMost = static_cast<std::size_t>(1) << 40;
+  // No object of a request is larger: what asks for more is mistaken, and the machine should not try to please it.
+  static constexpr std::size_t kMost = static_cast<std::size_t>(1) << 30;
   static constexpr std::size_t kLargestBlock = 256 * 1024;
   static constexpr unsigned kRemembered = 4;
 

@@ -2,6 +2,7 @@
 
 #include <array>
 #include <charconv>
+#include <cstdio>
 
 #include "broker/ClassTable.h"
 #include "broker/Convert.h"
@@ -42,6 +43,14 @@ const std::array<Kind, 14>& kinds() noexcept {
 std::string realText(double number) {
   char text[40];
   return std::string(text, std::to_chars(text, text + sizeof text, number).ptr);
+}
+
+/// As MOF has it; what is no printable ASCII character by its number.
+std::string characterText(CMPIChar16 code) {
+  if (code >= 0x20 && code < 0x7F && code != '\'' && code != '\\') return {'\'', static_cast<char>(code), '\''};
+  char text[16];
+  std::snprintf(text, sizeof text, "'\\x%04X'", static_cast<unsigned>(code));
+  return text;
 }
 
 std::string elementsText(const CMPIData* elements, std::size_t count) {
@@ -133,7 +142,7 @@ std::string dataText(const CMPIData& data) {
     case CMPI_boolean:
       return data.value.boolean != 0 ? "TRUE" : "FALSE";
     case CMPI_char16:
-      return "\\x" + std::to_string(data.value.char16);
+      return characterText(data.value.char16);
     case CMPI_real32:
       return realText(static_cast<double>(data.value.real32));
     case CMPI_real64:

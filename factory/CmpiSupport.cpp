@@ -87,7 +87,7 @@ CMPIArray* newArray(const CMPIBroker* broker, CMPICount size, CMPIType elementTy
 CMPIString* newString(const CMPIBroker* broker, const std::string& text, CMPIStatus* rc) {
   if (broker == nullptr) return nullptr;
   CMPIString* string = broker->eft->newString(broker, text.c_str(), rc);
-  return rc != nullptr && rc->rc != CMPI_RC_OK ? nullptr : string;
+  return (rc != nullptr && rc->rc != CMPI_RC_OK) || !isGood(string) ? nullptr : string;
 }
 
 void setNameSpace(CMPIObjectPath* path, const std::string& nameSpace) {

@@ -47,7 +47,7 @@ CMPIObjectPath* newPath(const CMPIBroker* broker, const std::string& nameSpace, 
 CMPIInstance* newInstance(const CMPIBroker* broker, const CMPIObjectPath* path, CMPIStatus* rc);
 CMPIArray* newArray(const CMPIBroker* broker, CMPICount size, CMPIType elementType, CMPIStatus* rc);
 
-// A string for an array element; null where the broker left a code in rc.
+// A string for an array element; null where the broker left a code in rc or made none that is good.
 CMPIString* newString(const CMPIBroker* broker, const std::string& text, CMPIStatus* rc);
 
 void setNameSpace(CMPIObjectPath* path, const std::string& nameSpace);

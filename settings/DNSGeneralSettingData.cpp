@@ -81,6 +81,7 @@ bool DNSGeneralSettingData::getDNSSuffixesToAppend(std::vector<std::string>& val
   if (interfaceFileExists(fileName)) {
     readList(fileName, "DNSSUFFIXES", values);
   } else {
+    values.clear();
     getProperty(NodeLexicon::PROP_DNS_SUFFIXES, values);
   }
   return true;

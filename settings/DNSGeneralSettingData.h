@@ -33,7 +33,7 @@ class DNSGeneralSettingData : public Instrumentation {
 
   // From the file while there is one, a missing key as empty text.
   bool getConfigurationName(std::string& value) const;                  // else false
-  bool getDNSSuffixesToAppend(std::vector<std::string>& values) const;  // else from the node; true in any case
+  bool getDNSSuffixesToAppend(std::vector<std::string>& values) const;  // else from the node, or empty; always true
 
   // Writes to the file, adding the key where it is missing; always true.
   bool setConfigurationName(const std::string& value);

@@ -61,6 +61,13 @@ void readLoggedScalar(const std::string& fileName, const char* key, const LogSit
   logVariable(loggerDNSSettingData, site, name, value);
 }
 
+// Empty where the node has no such property.
+template <typename Value>
+bool readProperty(const Instrumentation& node, NodeLexicon::Properties property, Value& value) {
+  value.clear();
+  return node.getProperty(property, value);
+}
+
 }  // namespace
 
 bool DNSSettingData::getBootProtocol(std::string& value) const {
@@ -70,13 +77,13 @@ bool DNSSettingData::getBootProtocol(std::string& value) const {
 }
 
 bool DNSSettingData::getDomainName(std::string& value) const {
-  if (!interfaceFileExists(fileName)) return getProperty(NodeLexicon::PROP_DOMAIN_NAME, value);
+  if (!interfaceFileExists(fileName)) return readProperty(*this, NodeLexicon::PROP_DOMAIN_NAME, value);
   readLoggedScalar(fileName, "DOMAINNAME", ZV_HERE, "domainName", value);
   return true;
 }
 
 bool DNSSettingData::getRequestedHostname(std::string& value) const {
-  if (!interfaceFileExists(fileName)) return getProperty(NodeLexicon::PROP_HOST_NAME, value);
+  if (!interfaceFileExists(fileName)) return readProperty(*this, NodeLexicon::PROP_HOST_NAME, value);
   readLoggedScalar(fileName, "HOSTNAME", ZV_HERE, "requestedHostname", value);
   return true;
 }
@@ -88,7 +95,7 @@ bool DNSSettingData::getConfigurationName(std::string& value) const {
 }
 
 bool DNSSettingData::getDNSServerAddresses(std::vector<std::string>& values) const {
-  if (!interfaceFileExists(fileName)) return getProperty(NodeLexicon::PROP_DNS_SERVER_ADDRESSES, values);
+  if (!interfaceFileExists(fileName)) return readProperty(*this, NodeLexicon::PROP_DNS_SERVER_ADDRESSES, values);
   readList(fileName, "DNSSERVERS", values);
   return true;
 }

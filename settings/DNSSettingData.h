@@ -12,8 +12,9 @@ namespace ZV {
 // operator++. A copy stands on the same node. Belongs to one operation and one thread. Exceptions of the
 // instrumentation pass out.
 //
-// A getter returns false where the value is not to be set on an instance; its output is then untouched. The readers of
-// the interface's file rely on operator bool having run for the node.
+// A getter returns false where the value is not to be set on an instance; its output is then untouched, or empty where
+// the node was asked in the place of the file. The readers of the interface's file rely on operator bool having run for
+// the node.
 class DNSSettingData : public Instrumentation {
  public:
   DNSSettingData();
@@ -31,7 +32,8 @@ class DNSSettingData : public Instrumentation {
   bool getDescription(std::string& value) const;
   bool getAddressOrigin(unsigned short& value) const;
 
-  // From the file while there is one, a missing key as empty text; else from the node, or false.
+  // From the file while there is one, a missing key as empty text; else from the node, false and empty where that has
+  // none. The boot protocol and the configuration's name stand in the file alone.
   bool getBootProtocol(std::string& value) const;
   bool getDomainName(std::string& value) const;
   bool getRequestedHostname(std::string& value) const;

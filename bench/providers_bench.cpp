@@ -1,0 +1,164 @@
+// What the providers cost by the number of objects, through the broker, as a client of zorvactl pays for it.
+#include <benchmark/benchmark.h>
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <array>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <string>
+
+#include "agent/Agent.h"
+#include "broker/Broker.h"
+#include "schema/Schema.h"
+
+namespace {
+
+namespace fs = std::filesystem;
+
+// A directory of this process with a configuration and a tree of interfaces; the agent reads it from then on.
+class BenchHost {
+ public:
+  BenchHost() {
+    std::string name = (fs::temp_directory_path() / "zorva-bench-XXXXXX").string();
+    if (::mkdtemp(name.data()) == nullptr) throw std::runtime_error("no temporary directory");
+    directory_ = name;
+    fs::create_directory(directory_ / "data");
+  }
+  ~BenchHost() { fs::remove_all(directory_); }
+  BenchHost(const BenchHost&) = delete;
+  BenchHost& operator=(const BenchHost&) = delete;
+
+  fs::path dataFile(int interface) const { return directory_ / "data" / ("ifcfg-eth" + std::to_string(interface)); }
+
+  // Each interface has one address and one suffix; the servers stand at every interface.
+  void use(int interfaces, int servers) {
+    std::ofstream tree(directory_ / "tree.json");
+    tree << R"({"system_name":"host1","nodes":[{"type":"System","name":"system","description":"Computer","children":[)";
+    for (int i = 0; i < interfaces; ++i) {
+      tree << (i == 0 ? "" : ",") << R"({"type":"Port","name":"eth)" << i
+           << R"(","description":"","children":[{"type":"NetworkIPConfig","name":"ip","description":"","properties":{)"
+           << R"("name":"eth)" << i << R"(","host_name":"host1","domain_name":"example.org",)"
+           << R"("dns_suffixes":["example.org"],"dns_server_addresses":[)";
+      for (int s = 0; s < servers; ++s) {
+        tree << (s == 0 ? "" : ",") << "\"192.0." << s / 250 << "." << s % 250 + 1 << '"';
+      }
+      tree << R"(],"protocol_if_type":4097,"enabled_state":1,)"
+           << R"("addresses":[{"address":"10.)" << i / 62500 << "." << i / 250 % 250 << "." << i % 250 + 1
+           << R"(","prefix_length":8,"origin":"static"}]}}]})";
+    }
+    tree << "]}]}";
+    tree.close();
+    std::ofstream(directory_ / "agent.toml")
+        << "[agent]\ndata_dir = \"data/\"\n[tree]\nsource = \"file\"\nfile = \"tree.json\"\n[log]\ntarget = \"off\"\n";
+    zorvagent::loadConfig((directory_ / "agent.toml").string());
+  }
+
+ private:
+  fs::path directory_;
+};
+
+zorva::broker::Broker& theBroker() {
+  static zorva::broker::Broker broker(zorva::schema::loadBuiltInClasses(), [] {
+    zorva::broker::BrokerOptions options;
+    options.providerDirectory = ZORVA_LIB_DIR;
+    return options;
+  }());
+  return broker;
+}
+
+std::size_t enumerateInstances(const char* className) {
+  std::size_t count = 0;
+  const zorva::broker::Status status =
+      theBroker().enumerateInstances("", className, {}, [&](const zorva::broker::Instance&) {
+        ++count;
+        return true;
+      });
+  if (status.rc != 0) throw std::runtime_error(status.message);
+  return count;
+}
+
+void run(benchmark::State& state, const char* className, std::size_t expected) {
+  for (auto _ : state) {
+    if (enumerateInstances(className) != expected) state.SkipWithError("wrong number of instances");
+  }
+  state.SetItemsProcessed(static_cast<std::int64_t>(expected) * state.iterations());
+}
+
+void Endpoints(benchmark::State& state) {
+  BenchHost host;
+  host.use(static_cast<int>(state.range(0)), 2);
+  run(state, "ZORVA_DNSProtocolEndPoint", static_cast<std::size_t>(state.range(0)));
+}
+BENCHMARK(Endpoints)->Arg(100)->Arg(1000)->Arg(10000)->Unit(benchmark::kMillisecond);
+
+// Servers by endpoints.
+void RemoteAccess(benchmark::State& state) {
+  BenchHost host;
+  host.use(static_cast<int>(state.range(1)), static_cast<int>(state.range(0)));
+  run(state, "ZORVA_RemoteAccessAvailableToElement", static_cast<std::size_t>(state.range(0) * state.range(1)));
+}
+BENCHMARK(RemoteAccess)->Args({8, 32})->Args({64, 256})->Unit(benchmark::kMillisecond);
+
+constexpr int kFiles = 1000;
+
+void writeFiles(const BenchHost& host) {
+  for (int i = 0; i < kFiles; ++i) {
+    std::ofstream(host.dataFile(i)) << "BOOTPROTO=dhcp\nDOMAINNAME=example.org\nHOSTNAME=host1\nCONFIG_NAME=lab\n"
+                                    << "DNSSERVERS=192.0.2.1 192.0.2.2 \nDNSSUFFIXES=example.org \n";
+  }
+}
+
+void SettingDataFromFiles(benchmark::State& state) {
+  BenchHost host;
+  host.use(kFiles, 2);
+  writeFiles(host);
+  run(state, "ZORVA_DNSSettingData", kFiles);
+}
+BENCHMARK(SettingDataFromFiles)->Unit(benchmark::kMillisecond);
+
+// What reading four keys of each file cannot do without.
+void FourPassesOverFiles(benchmark::State& state) {
+  BenchHost host;
+  host.use(kFiles, 2);
+  writeFiles(host);
+  std::array<char, 4096> buffer{};
+  for (auto _ : state) {
+    for (int pass = 0; pass < 4; ++pass) {
+      for (int i = 0; i < kFiles; ++i) {
+        const std::string path = host.dataFile(i).string();
+        struct stat status {};
+        if (::stat(path.c_str(), &status) != 0) state.SkipWithError("no file");
+        const int file = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
+        while (::read(file, buffer.data(), buffer.size()) > 0) {
+        }
+        ::close(file);
+      }
+    }
+  }
+}
+BENCHMARK(FourPassesOverFiles)->Unit(benchmark::kMillisecond);
+
+// All eight associations by the number of interfaces.
+void Association(benchmark::State& state, const char* className) {
+  BenchHost host;
+  host.use(static_cast<int>(state.range(0)), 2);
+  const std::size_t count = enumerateInstances(className);
+  run(state, className, count);
+}
+#define ASSOCIATION_BENCHMARK(name) \
+  BENCHMARK_CAPTURE(Association, name, "ZORVA_" #name)->Arg(8)->Arg(64)->Arg(512)->Unit(benchmark::kMillisecond)
+ASSOCIATION_BENCHMARK(RemoteAccessAvailableToElement);
+ASSOCIATION_BENCHMARK(DNSSAPSAPDependency);
+ASSOCIATION_BENCHMARK(DNSHostedAccessPoint);
+ASSOCIATION_BENCHMARK(DNSGeneralElementSettingData);
+ASSOCIATION_BENCHMARK(DNSGenEndPointElementSettingData);
+ASSOCIATION_BENCHMARK(DNSEndPointElementSettingData);
+ASSOCIATION_BENCHMARK(DNSGenOrderedComponent);
+ASSOCIATION_BENCHMARK(DNSOrderedComponent);
+
+}  // namespace
+
+BENCHMARK_MAIN();

@@ -1,0 +1,121 @@
+#include "cli/JsonOutput.h"
+
+#include <nlohmann/json.hpp>
+
+#include "broker/PathText.h"
+#include "cli/Text.h"
+#include "cli/ValueText.h"
+
+namespace zorva::cli {
+
+namespace {
+
+using Json = nlohmann::ordered_json;
+
+std::string dumped(const Json& json) { return json.dump(2); }
+
+Json ofScalar(const broker::Scalar& scalar) {
+  if (const auto* value = std::get_if<bool>(&scalar)) return *value;
+  if (const auto* value = std::get_if<std::uint64_t>(&scalar)) return *value;
+  if (const auto* value = std::get_if<std::int64_t>(&scalar)) return *value;
+  if (const auto* value = std::get_if<double>(&scalar)) return *value;
+  if (const auto* value = std::get_if<char16_t>(&scalar)) return static_cast<unsigned>(*value);
+  if (std::holds_alternative<std::monostate>(scalar)) return nullptr;
+  if (const auto* value = std::get_if<broker::Boxed<broker::ObjectPath>>(&scalar)) {
+    return jsonSafe(broker::pathText(**value));
+  }
+  return jsonSafe(scalarText(scalar));
+}
+
+Json ofValue(const broker::Value& value) {
+  if (value.isNull) return nullptr;
+  if (!value.isArray) return ofScalar(value.scalar);
+  Json list = Json::array();
+  for (const broker::Scalar& element : value.elements) list.push_back(ofScalar(element));
+  return list;
+}
+
+Json ofTexts(const std::vector<std::string>& texts) {
+  Json list = Json::array();
+  for (const std::string& text : texts) list.push_back(jsonSafe(text));
+  return list;
+}
+
+Json ofClassRows(const std::vector<ClassRow>& rows) {
+  Json list = Json::array();
+  for (const ClassRow& row : rows) {
+    Json entry;
+    entry["class"] = row.name;
+    entry["provider"] = row.provider;
+    entry["library"] = row.library;
+    entry["instances"] = row.count ? Json(*row.count) : Json(nullptr);
+    if (!row.problem.empty()) entry["problem"] = jsonSafe(row.problem);
+    list.push_back(std::move(entry));
+  }
+  return list;
+}
+
+Json ofEndpoint(const EndpointRow& row) {
+  Json entry;
+  entry["name"] = jsonSafe(row.name);
+  entry["system"] = jsonSafe(row.system);
+  entry["state"] = row.stateNumber ? Json(*row.stateNumber) : Json(nullptr);
+  entry["host_name"] = jsonSafe(row.hostName);
+  entry["domain_name"] = jsonSafe(row.domainName);
+  entry["suffixes"] = ofTexts(row.suffixes);
+  return entry;
+}
+
+Json ofSetting(const SettingRow& row) {
+  Json entry;
+  entry["interface"] = jsonSafe(row.interface);
+  entry["setting"] = row.setting;
+  entry["value"] = row.isList ? ofTexts(row.values) : Json(jsonSafe(row.values.empty() ? "" : row.values.front()));
+  entry["from"] = row.source == SettingSource::None ? Json(nullptr) : Json(sourceName(row.source));
+  return entry;
+}
+
+template <class Row, class Convert>
+Json ofRows(const std::vector<Row>& rows, Convert convert) {
+  Json list = Json::array();
+  for (const Row& row : rows) list.push_back(convert(row));
+  return list;
+}
+
+}  // namespace
+
+std::string instanceJson(const broker::Instance& instance, std::size_t depth) {
+  Json json;
+  json["class"] = instance.path.className;
+  json["path"] = jsonSafe(broker::pathText(instance.path));
+  json["properties"] = Json::object();
+  for (const broker::Property& property : instance.properties) {
+    json["properties"][property.name] = ofValue(property.value);
+  }
+  const std::string text = dumped(json);
+  std::string shifted;
+  for (const char c : text) {
+    shifted += c;
+    if (c == '\n') shifted.append(depth, ' ');
+  }
+  return shifted;
+}
+
+std::string pathJson(const broker::ObjectPath& path) { return dumped(jsonSafe(broker::pathText(path))); }
+
+std::string hostViewJson(const HostView& view) {
+  Json json;
+  json["system"] = jsonSafe(view.systemName);
+  json["endpoints"] = ofRows(view.endpoints, ofEndpoint);
+  json["servers"] = ofRows(view.servers, [](const ServerRow& row) {
+    return Json{{"order", row.order}, {"address", jsonSafe(row.address)}};
+  });
+  json["interface_settings"] = ofRows(view.interfaceSettings, ofSetting);
+  json["host_settings"] = ofRows(view.hostSettings, ofSetting);
+  json["classes"] = ofClassRows(view.classes);
+  return dumped(json);
+}
+
+std::string classRowsJson(const std::vector<ClassRow>& rows) { return dumped(ofClassRows(rows)); }
+
+}  // namespace zorva::cli

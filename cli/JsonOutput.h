@@ -1,0 +1,28 @@
+#pragma once
+
+#include <cstddef>
+#include <string>
+
+#include "broker/Value.h"
+#include "cli/HostView.h"
+
+// JSON documents (RFC 8259) of what the commands show. Each text is indented by two blanks and has no line feed at its
+// end. Bytes that are no UTF-8 come out as jsonSafe() has them.
+
+namespace zorva::cli {
+
+/// An instance as an object: "class", "path", and "properties" in the order in which they were set; a property that is
+/// null is null, a reference is the text of its path. `depth` is by how many blanks the lines after the first are
+/// shifted.
+std::string instanceJson(const broker::Instance& instance, std::size_t depth);
+
+/// A path's text as a JSON string.
+std::string pathJson(const broker::ObjectPath& path);
+
+/// What `show` shows.
+std::string hostViewJson(const HostView& view);
+
+/// The rows of `classes`.
+std::string classRowsJson(const std::vector<ClassRow>& rows);
+
+}  // namespace zorva::cli

@@ -1,0 +1,134 @@
+#include "cli/Session.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <filesystem>
+#include <vector>
+
+#include "agent/Agent.h"
+#include "cli/Failure.h"
+#include "cli/Text.h"
+#include "schema/Names.h"
+#include "schema/Schema.h"
+
+namespace zorva::cli {
+
+namespace {
+
+constexpr const char* kProfileLibrary = "libzorvadnsclientprofileprovider.so.1";
+
+/// Where the provider libraries lie: beside this program, as built or as installed. Empty leaves it to the dynamic
+/// loader.
+std::string defaultProviderDirectory() {
+  std::error_code ignored;
+  const std::filesystem::path program = std::filesystem::read_symlink("/proc/self/exe", ignored);
+  for (const char* libraries : {"lib", ZORVA_INSTALL_LIBDIR}) {
+    const std::filesystem::path directory = program.parent_path().parent_path() / libraries;
+    if (std::filesystem::exists(directory / kProfileLibrary, ignored)) return directory.string();
+  }
+  return {};
+}
+
+/// What the agent throws for files that a person wrote is that person's to mend; all else is a failure.
+template <class Work>
+auto asFailure(Work work) {
+  try {
+    return work();
+  } catch (const zorvagent::ConfigError& error) {
+    throw Failure(ExitCode::WrongUsage, error.what());
+  } catch (const std::runtime_error& error) {
+    throw Failure(ExitCode::Failed, printable(error.what()));
+  }
+}
+
+std::string similarNames(const schema::ClassRepository& classes, std::string_view name) {
+  std::vector<std::string> similar;
+  std::string wanted(name);
+  std::transform(wanted.begin(), wanted.end(), wanted.begin(), schema::lowerAscii);
+  if (const std::size_t underscore = wanted.find('_'); underscore != std::string::npos) wanted.erase(0, underscore + 1);
+  for (const schema::Class* each : classes.classes()) {
+    std::string known = each->name();
+    std::transform(known.begin(), known.end(), known.begin(), schema::lowerAscii);
+    const bool fits = wanted.size() >= 3 && known.find(wanted) != std::string::npos;
+    if (fits && known.starts_with("zorva_") && similar.size() < 5) similar.push_back(each->name());
+  }
+  if (similar.empty()) return "zorvactl classes lists them";
+  return "is it " + joined(similar, ", ") + "?";
+}
+
+void tell(const char* kind, std::string_view what) {
+  std::fflush(stdout);
+  const std::string line = std::string("zorvactl: ") + kind + std::string(what) + "\n";
+  std::fwrite(line.data(), 1, line.size(), stderr);
+}
+
+}  // namespace
+
+Session::Session(const Arguments& arguments)
+    : layout_(Layout::ofStandardOutput()), logLevel_(6000), providerDirectory_(arguments.providerDirectory) {
+  asFailure([&] {
+    zorvagent::loadConfig(arguments.config);
+    if (arguments.logLevel) zorvagent::setLogLevel(zorvagent::LogStream::Log, *arguments.logLevel);
+    logLevel_ = arguments.logLevel.value_or(zorvagent::currentConfig().logLevel);
+  });
+}
+
+Session::~Session() = default;
+
+const std::shared_ptr<const schema::ClassRepository>& Session::classes() {
+  if (classes_ == nullptr) classes_ = schema::loadBuiltInClasses();
+  return classes_;
+}
+
+const schema::Class& Session::classNamed(std::string_view name) {
+  const schema::Class* found = classes()->find(name);
+  if (found != nullptr) return *found;
+  throw Failure(ExitCode::WrongUsage, "there is no class " + printable(name), similarNames(*classes(), name));
+}
+
+std::shared_ptr<const zorvagent::TreeSnapshot> Session::tree() const {
+  return asFailure([] { return zorvagent::currentTree(); });
+}
+
+broker::Broker& Session::broker() {
+  if (broker_ != nullptr) return *broker_;
+  tree();
+  broker::BrokerOptions options;
+  options.providerDirectory = providerDirectory_.empty() ? defaultProviderDirectory() : providerDirectory_;
+  options.log = [this](broker::LogLevel level, std::string_view text) { log(level, text); };
+  broker_ = std::make_unique<broker::Broker>(classes(), std::move(options));
+  return *broker_;
+}
+
+void Session::log(broker::LogLevel level, std::string_view text) const {
+  // The broker's levels on the agent's scale of numbers.
+  constexpr int kLevels[] = {3000, 4000, 5000, 6000};
+  const int number = kLevels[static_cast<std::size_t>(level)];
+  if (number < std::min(logLevel_, 5000) || (quiet_ > 0 && number < 6000)) return;
+  tell(level == broker::LogLevel::Error     ? "error: "
+       : level == broker::LogLevel::Warning ? "warning: "
+                                            : "",
+       printable(text));
+}
+
+void tellError(std::string_view what, std::string_view hint) {
+  tell("", what);
+  if (!hint.empty()) tell("", hint);
+}
+
+void tellWarning(std::string_view what) { tell("warning: ", what); }
+
+void write(std::string_view text) {
+  if (std::fwrite(text.data(), 1, text.size(), stdout) != text.size()) flushOutput();
+}
+
+void flushOutput() {
+  if (std::fflush(stdout) == 0 && std::ferror(stdout) == 0) return;
+  throw Failure(ExitCode::Failed, std::string("cannot write to standard output: ") + std::strerror(errno));
+}
+
+}  // namespace zorva::cli

@@ -1,0 +1,21 @@
+// tree.
+#include <string>
+#include <vector>
+
+#include "agent/Agent.h"
+#include "cli/Commands.h"
+#include "cli/ResultWriter.h"
+#include "cli/Session.h"
+#include "cli/Text.h"
+#include "cli/TreeText.h"
+
+namespace zorva::cli {
+
+void showTree(const Arguments& arguments) {
+  requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "tree");
+  const Session session(arguments);
+  const std::shared_ptr<const zorvagent::TreeSnapshot> tree = session.tree();
+  write(arguments.output == OutputFormat::Json ? zorvagent::treeToJson(*tree) : treeText(*tree, session.layout()));
+}
+
+}  // namespace zorva::cli

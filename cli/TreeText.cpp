@@ -1,0 +1,116 @@
+#include "cli/TreeText.h"
+
+#include <algorithm>
+#include <vector>
+
+#include "cli/Text.h"
+
+namespace zorva::cli {
+
+namespace {
+
+using zorvagent::Node;
+using zorvagent::NodeType;
+using zorvagent::Property;
+using zorvagent::TreeSnapshot;
+
+struct PropertyWord {
+  zorvagent::PropertyNumber number;
+  const char* word;  // as in the JSON document of a tree
+};
+
+constexpr PropertyWord kProperties[] = {
+    {ZV::NodeLexicon::PROP_NAME, "name"},
+    {ZV::NodeLexicon::PROP_HOST_NAME, "host_name"},
+    {ZV::NodeLexicon::PROP_DOMAIN_NAME, "domain_name"},
+    {ZV::NodeLexicon::PROP_DNS_SUFFIXES, "dns_suffixes"},
+    {ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES, "dns_server_addresses"},
+    {ZV::NodeLexicon::PROP_PROTOCOL_IF_TYPE, "protocol_if_type"},
+    {ZV::NodeLexicon::PROP_ENABLED_STATE, "enabled_state"},
+    {zorvagent::kAddresses, "addresses"},
+};
+
+const char* originWord(zorvagent::AddressOrigin origin) noexcept {
+  switch (origin) {
+    case zorvagent::AddressOrigin::Static:
+      return " static";
+    case zorvagent::AddressOrigin::Dhcp:
+      return " dhcp";
+    case zorvagent::AddressOrigin::Slaac:
+      return " slaac";
+    case zorvagent::AddressOrigin::LinkLocal:
+      return " link-local";
+    case zorvagent::AddressOrigin::Unknown:
+      break;
+  }
+  return "";
+}
+
+struct ValueWords {
+  std::string operator()(unsigned int number) const { return std::to_string(number); }
+  std::string operator()(const std::string& text) const { return text; }
+  std::string operator()(const zorvagent::SharedStrings& list) const { return joined(*list, ", "); }
+  std::string operator()(const zorvagent::SharedAddresses& list) const {
+    std::vector<std::string> texts;
+    for (const zorvagent::InterfaceAddress& each : *list) {
+      texts.push_back(each.address + "/" + std::to_string(each.prefixLength) + originWord(each.origin));
+    }
+    return joined(texts, ", ");
+  }
+};
+
+const char* typeWord(NodeType type) noexcept {
+  switch (type) {
+    case NodeType::System:
+      return "System";
+    case NodeType::Port:
+      return "Port";
+    case NodeType::NetworkIPConfig:
+      return "NetworkIPConfig";
+    case NodeType::Root:
+      break;
+  }
+  return "";
+}
+
+std::size_t depthOf(const TreeSnapshot& tree, const Node& node) {
+  std::size_t depth = 0;
+  for (const Node* at = &node; at->type() != NodeType::Root; at = &tree.parent(*at)) ++depth;
+  return depth;
+}
+
+std::string headLine(const Node& node, std::size_t indent, const Layout& layout) {
+  std::string line(indent, ' ');
+  line += styled(printable(node.name()), Style::Heading, layout) + "  " + typeWord(node.type());
+  if (!node.description().empty()) line += ", \"" + printable(node.description()) + "\"";
+  return line + "\n";
+}
+
+std::string propertyLines(const Node& node, std::size_t indent, const Layout& layout) {
+  Table table({}, indent);
+  for (const PropertyWord& known : kProperties) {
+    const Property* property = node.find(known.number);
+    if (property == nullptr) continue;
+    const std::string value = std::visit(ValueWords(), property->value);
+    if (property->overlaid) {
+      table.add({known.word, value, Cell("(set, not the host's own)", Style::Warning)});
+    } else {
+      table.add({known.word, value});
+    }
+  }
+  return table.text(layout);
+}
+
+}  // namespace
+
+std::string treeText(const TreeSnapshot& tree, const Layout& layout) {
+  std::string out = styled(printable(tree.systemName()), Style::Heading, layout) + "\n";
+  for (const Node& node : tree.nodes()) {
+    if (node.type() == NodeType::Root) continue;
+    const std::size_t indent = 2 * depthOf(tree, node);
+    out += headLine(node, indent, layout) + propertyLines(node, indent + 4, layout);
+  }
+  return out;
+}
+
+}  // namespace zorva::cli

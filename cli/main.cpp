@@ -1,0 +1,38 @@
+#include <cstdio>
+#include <exception>
+#include <variant>
+
+#include "cli/Arguments.h"
+#include "cli/Failure.h"
+#include "cli/Session.h"
+
+namespace {
+
+using namespace zorva::cli;
+
+ExitCode run(int argc, const char* const* argv) {
+  const auto read = readArguments(argc, argv);
+  if (const auto* telling = std::get_if<Telling>(&read)) {
+    if (telling->isError) throw Failure(ExitCode::WrongUsage, telling->text, "zorvactl --help shows the usage");
+    write(telling->text);
+  } else {
+    const auto& invocation = std::get<Invocation>(read);
+    invocation.command(invocation.arguments);
+  }
+  flushOutput();
+  return ExitCode::Done;
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  try {
+    return static_cast<int>(run(argc, argv));
+  } catch (const Failure& failure) {
+    tellError(failure.what(), failure.hint());
+    return static_cast<int>(failure.exitCode());
+  } catch (const std::exception& error) {
+    tellError(error.what());
+    return static_cast<int>(ExitCode::Failed);
+  }
+}

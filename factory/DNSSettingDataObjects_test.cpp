@@ -1,0 +1,402 @@
+#include "factory/DNSSettingDataObjects.h"
+
+#include <gmock/gmock.h>
+
+#include <memory>
+#include <stdexcept>
+
+#include "ProviderCall.h"
+#include "World.h"
+
+namespace ZV::Test {
+namespace {
+
+using std::string_literals::operator""s;
+using ::testing::Contains;
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+using ::testing::Not;
+using ::testing::SizeIs;
+
+constexpr const char* kClass = "ZORVA_DNSSettingData";
+constexpr const char* kLogger = "Zorvagent.DNSObjFactory";
+
+const std::vector<std::string> kAllProperties = {"InstanceID",         "Caption",           "Description",
+                                                 "ElementName",        "AddressOrigin",     "DomainName",
+                                                 "RequestedHostname",  "ConfigurationName", "UseSuffixWhenRegistering",
+                                                 "DNSServerAddresses", "DHCPOptionsToUse"};
+
+class DNSSettingDataObjectsTest : public ::testing::Test {
+ protected:
+  DNSSettingDataObjectsTest() { world_->nic("eth0", usualNic()).install(); }
+
+  // A host without anything in the place of the one with a usual interface.
+  World& newWorld() {
+    world_.reset();
+    world_ = std::make_unique<World>();
+    return *world_;
+  }
+
+  CMPIInstance* make(PropertyList properties = nullptr, bool isObjPath = false) {
+    DNSSettingData data;
+    EXPECT_TRUE(static_cast<bool>(data));
+    logger_.clear();
+    return makeDNSSettingDataInstance(broker_.cmpi(), ref_, data, properties.cmpi(), isObjPath, &status_);
+  }
+  Instance made(PropertyList properties = nullptr, bool isObjPath = false) {
+    return RecordingBroker::read(make(std::move(properties), isObjPath));
+  }
+  // The place among all calls of the n-th call of a slot, as failAt counts.
+  std::size_t placeOf(std::string_view name, std::size_t n) const {
+    const Calls calls = broker_.calls();
+    for (std::size_t i = 0; i < calls.size(); ++i) {
+      if (calls[i].name == name && --n == 0) return i + 1;
+    }
+    throw std::out_of_range("no such call");
+  }
+  LogLines lines() const { return logger_.pairs().ofCategory(kLogger); }
+
+  std::unique_ptr<World> world_ = std::make_unique<World>();
+  RecordingLogger logger_;
+  RecordingBroker broker_;
+  CMPIObjectPath* ref_ = broker_.make(Path(kClass), "ref");
+  CMPIStatus status_ = {CMPI_RC_OK, nullptr};
+};
+
+// --- which properties
+
+TEST_F(DNSSettingDataObjectsTest, WithoutAListAllPropertiesAreSetInTheirOrder) {
+  EXPECT_EQ(kAllProperties, made().names());
+}
+
+TEST_F(DNSSettingDataObjectsTest, WithoutAListButForThePathAloneTheKeyIsSet) {
+  EXPECT_THAT(made(nullptr, true).names(), ElementsAre("InstanceID"));
+}
+
+TEST_F(DNSSettingDataObjectsTest, WithAnEmptyListTheKeyIsSet) {
+  EXPECT_THAT(made({}, false).names(), ElementsAre("InstanceID"));
+  EXPECT_THAT(made({}, true).names(), ElementsAre("InstanceID"));
+}
+
+TEST_F(DNSSettingDataObjectsTest, WithAListTheKeyAndWhatItNamesAreSet) {
+  for (const bool isObjPath : {false, true}) {
+    EXPECT_THAT(made({"ElementName", "Caption"}, isObjPath).names(),
+                ElementsAre("InstanceID", "Caption", "ElementName"));
+  }
+}
+
+TEST_F(DNSSettingDataObjectsTest, EachPropertyCanBeAskedForAlone) {
+  for (const std::string& name : kAllProperties) {
+    const std::vector<std::string> expected =
+        name == "InstanceID" ? std::vector{name} : std::vector{"InstanceID"s, name};
+    EXPECT_EQ(expected, made({name}).names());
+  }
+}
+
+TEST_F(DNSSettingDataObjectsTest, NamesOfTheListAreExactText) {
+  make({"caption", "Captio", "Caption "});
+  EXPECT_THAT(broker_.calls().only({"setProperty"}), SizeIs(1));
+}
+
+TEST_F(DNSSettingDataObjectsTest, NamesThatTheClassLacksOrThatStandTwiceAreNoMatter) {
+  EXPECT_THAT(made({"NoSuchProperty", "Caption", "Caption", ""}).names(), ElementsAre("InstanceID", "Caption"));
+}
+
+TEST_F(DNSSettingDataObjectsTest, TheFilterIsSetWhereMoreThanThePathIsWanted) {
+  make(nullptr, false);
+  EXPECT_THAT(broker_.calls().lines(), Contains("I1.setPropertyFilter(null, {\"InstanceID\"})"));
+  broker_.startOver();
+  make({"Caption"}, false);
+  EXPECT_THAT(broker_.calls().lines(), Contains("I1.setPropertyFilter({\"Caption\"}, {\"InstanceID\"})"));
+  broker_.startOver();
+  make({"Caption"}, true);
+  EXPECT_THAT(broker_.calls().only({"setPropertyFilter"}), IsEmpty());
+}
+
+// --- values
+
+TEST_F(DNSSettingDataObjectsTest, ValuesHaveTheTypesOfTheClass) {
+  world_->file("eth0", "CONFIG_NAME=office\nDOMAINNAME=d\nHOSTNAME=h\nDNSSERVERS=192.0.2.1 192.0.2.2 \n");
+  const Instance instance = made();
+  EXPECT_EQ(chars("Computer%eth0"), instance["InstanceID"]);
+  EXPECT_EQ(chars("DNS Setting Configuration"), instance["Caption"]);
+  EXPECT_EQ(chars("Represents DNS Setting Configuration for DNS Protocol EndPoint"), instance["Description"]);
+  EXPECT_EQ(chars("DNSSettingData.eth0"), instance["ElementName"]);
+  EXPECT_EQ(uint16(2), instance["AddressOrigin"]);
+  EXPECT_EQ(chars("d"), instance["DomainName"]);
+  EXPECT_EQ(chars("h"), instance["RequestedHostname"]);
+  EXPECT_EQ(chars("office"), instance["ConfigurationName"]);
+  EXPECT_EQ(boolean(false), instance["UseSuffixWhenRegistering"]);
+  EXPECT_EQ(texts({"192.0.2.1", "192.0.2.2"}), instance["DNSServerAddresses"]);
+  EXPECT_EQ(uint16s({8, 14, 17}), instance["DHCPOptionsToUse"]);
+}
+
+TEST_F(DNSSettingDataObjectsTest, EmptyTextsAreSet) {
+  world_->file("eth0", "");
+  const Instance instance = made();
+  EXPECT_EQ(chars(""), instance["DomainName"]);
+  EXPECT_EQ(chars(""), instance["RequestedHostname"]);
+  EXPECT_EQ(chars(""), instance["ConfigurationName"]);
+}
+
+TEST_F(DNSSettingDataObjectsTest, ABareInterfaceLacksWhatNobodyKnows) {
+  newWorld().nic("eth0").install();
+  EXPECT_THAT(made().names(), ElementsAre("InstanceID", "Caption", "Description", "ElementName", "AddressOrigin",
+                                          "ConfigurationName", "UseSuffixWhenRegistering", "DHCPOptionsToUse"));
+}
+
+TEST_F(DNSSettingDataObjectsTest, AnEmptyListOfServersIsLeftOut) {
+  world_->file("eth0", "DNSSERVERS=\n");
+  EXPECT_FALSE(made().has("DNSServerAddresses"));
+  EXPECT_FALSE(made({"DNSServerAddresses"}).has("DNSServerAddresses"));
+}
+
+TEST_F(DNSSettingDataObjectsTest, ServersAreCountedInSixteenBits) {
+  std::string content = "DNSSERVERS=";
+  for (int i = 0; i < 65536 + 3; ++i) content += std::to_string(i) + " ";
+  world_->file("eth0", content + "\n");
+  EXPECT_EQ(texts({"0", "1", "2"}), made()["DNSServerAddresses"]);
+}
+
+TEST_F(DNSSettingDataObjectsTest, AHundredThousandServersGiveWhatIsLeftOfTheirNumber) {
+  std::string content = "DNSSERVERS=";
+  for (int i = 0; i < 100000; ++i) content += std::to_string(i) + " ";
+  world_->file("eth0", content + "\n");
+  broker_.keepsLines = false;
+  EXPECT_THAT(made()["DNSServerAddresses"].texts(), SizeIs(100000 - 65536));
+}
+
+TEST_F(DNSSettingDataObjectsTest, AValueOfAMebibyteIsSetWhole) {
+  const std::string value(1 << 20, 'v');
+  world_->file("eth0", "CONFIG_NAME=" + value + "\n");
+  EXPECT_EQ(chars(value), made()["ConfigurationName"]);
+}
+
+// --- failures of the broker
+
+TEST_F(DNSSettingDataObjectsTest, APathThatCannotBeMadeGivesNull) {
+  for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
+    broker_.startOver();
+    broker_.failNext("newObjectPath", mode);
+    EXPECT_EQ(nullptr, make()) << nameOf(mode);
+    EXPECT_EQ(0U, broker_.callsOf("newInstance"));
+    EXPECT_THAT(lines().errors(), IsEmpty());
+    EXPECT_FALSE(lines().exited("makeDNSSettingDataInstance"));
+    EXPECT_EQ(CMPI_RC_OK, status_.rc);
+  }
+}
+
+TEST_F(DNSSettingDataObjectsTest, AnInstanceThatCannotBeMadeComesBackAsTheBrokerGaveIt) {
+  for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
+    broker_.startOver();
+    broker_.failNext("newInstance", mode);
+    const CMPIInstance* instance = make();
+    EXPECT_EQ(mode == Mode::NullHandle, instance != nullptr) << nameOf(mode);
+    EXPECT_EQ(0U, broker_.callsOf("setProperty"));
+    EXPECT_EQ(0U, broker_.callsOf("setPropertyFilter"));
+    EXPECT_THAT(lines().errors(), IsEmpty());
+    EXPECT_FALSE(lines().exited("makeDNSSettingDataInstance"));
+    EXPECT_EQ(CMPI_RC_OK, status_.rc);
+  }
+}
+
+TEST_F(DNSSettingDataObjectsTest, PathAndInstanceAreMadeWithoutTheStatus) {
+  for (const char* name : {"newObjectPath", "newInstance", "getNameSpace"}) {
+    broker_.startOver();
+    broker_.failNext(name, Mode::SetRc);
+    EXPECT_EQ(kAllProperties, made().names());
+    EXPECT_EQ(CMPI_RC_OK, status_.rc) << name;
+  }
+}
+
+TEST_F(DNSSettingDataObjectsTest, AnArrayOfServersThatCannotBeMadeEndsTheWork) {
+  for (const Mode mode : {Mode::ReturnNull, Mode::RcAndNull}) {
+    broker_.startOver();
+    broker_.failNext("newArray", mode);
+    EXPECT_THAT(made().names(), Not(Contains(testing::AnyOf("DNSServerAddresses", "DHCPOptionsToUse"))));
+    EXPECT_EQ(1U, broker_.callsOf("newArray"));
+    EXPECT_THAT(lines().errors(), ElementsAre("Create Array for Property DNSServerAddresses failed."));
+    EXPECT_EQ("makeDNSSettingDataInstance", lines().back().function);
+    EXPECT_EQ("factory/DNSSettingDataObjects.cpp", lines().back().file);
+    EXPECT_FALSE(lines().exited("makeDNSSettingDataInstance"));
+    EXPECT_EQ(mode == Mode::RcAndNull ? CMPI_RC_ERR_FAILED : CMPI_RC_OK, status_.rc);
+    status_.rc = CMPI_RC_OK;
+  }
+}
+
+TEST_F(DNSSettingDataObjectsTest, AnArrayOfOptionsThatCannotBeMadeEndsTheWork) {
+  newWorld().nic("eth0").install();
+  for (const Mode mode : {Mode::ReturnNull, Mode::RcAndNull}) {
+    broker_.startOver();
+    broker_.failNext("newArray", mode);
+    EXPECT_THAT(made().names(), Not(Contains("DHCPOptionsToUse")));
+    EXPECT_THAT(lines().errors(), ElementsAre("Create Array for Property DHCPOptionsToUse failed."));
+    EXPECT_EQ("makeDNSSettingDataInstance", lines().back().function);
+    EXPECT_FALSE(lines().exited("makeDNSSettingDataInstance"));
+  }
+}
+
+TEST_F(DNSSettingDataObjectsTest, AnArrayWithoutAHandleIsSkippedAndTheWorkGoesOn) {
+  broker_.failNext("newArray", Mode::NullHandle);
+  EXPECT_THAT(made().names(), Contains("DHCPOptionsToUse"));
+  EXPECT_THAT(lines().errors(), IsEmpty());
+  EXPECT_TRUE(lines().exited("makeDNSSettingDataInstance"));
+}
+
+TEST_F(DNSSettingDataObjectsTest, AServerWhoseStringFailsLeavesItsElementUnset) {
+  world_->file("eth0", "DNSSERVERS=a b c \n");
+  for (const Mode mode : {Mode::SetRc, Mode::RcAndNull, Mode::ReturnNull}) {
+    broker_.startOver();
+    broker_.failNext("newString", mode);
+    EXPECT_EQ(list(CMPI_stringA, {null(CMPI_string), text("b"), text("c")}), made()["DNSServerAddresses"]);
+    EXPECT_EQ(3U, broker_.callsOf("newString"));
+    EXPECT_THAT(lines().errors(), IsEmpty());
+  }
+}
+
+TEST_F(DNSSettingDataObjectsTest, ALastServerWhoseStringFailsLeavesItsCodeInTheStatus) {
+  world_->file("eth0", "DNSSERVERS=a b \n");
+  make({"DNSServerAddresses"});
+  broker_.failAt(placeOf("newString", 2), Mode::SetRc);
+  make({"DNSServerAddresses"});
+  EXPECT_EQ(CMPI_RC_ERR_FAILED, status_.rc);
+}
+
+TEST_F(DNSSettingDataObjectsTest, WhatTheInstanceRefusesStaysUnset) {
+  broker_.failEach("setProperty", Mode::SetRc);
+  EXPECT_THAT(made().names(), IsEmpty());
+  EXPECT_EQ(kAllProperties.size(), broker_.callsOf("setProperty"));
+  EXPECT_EQ(CMPI_RC_OK, status_.rc);
+  EXPECT_THAT(lines().errors(), IsEmpty());
+}
+
+TEST_F(DNSSettingDataObjectsTest, WhateverTheBrokerFailsAtNothingBreaks) {
+  world_->nic("eth1", usualNic()).install();
+  const CMPIObjectPath* ref = broker_.make(Path(kClass).key("InstanceID", "Computer%eth1"));
+  const std::size_t tried = forEachFailure(
+      broker_,
+      [&](std::size_t, Mode mode) {
+        std::vector<CMPIInstance*> instances;
+        std::vector<CMPIObjectPath*> paths;
+        CMPIInstance* one = nullptr;
+        try {
+          EXPECT_EQ(0, getAllDNSSettingDataCMPIInstances(broker_.cmpi(), ref, nullptr, &instances, &status_));
+          EXPECT_THAT(instances, SizeIs(2));
+          const auto failed = getAllDNSSettingDataCMPIObjectPaths(broker_.cmpi(), ref, &paths, &status_);
+          EXPECT_EQ(failed == 0, paths.size() == 2);
+          getOneDNSSettingDataCMPIInstance(broker_.cmpi(), ref, nullptr, &one, &status_);
+        } catch (const InjectedFailure&) {
+          EXPECT_EQ(Mode::Throw, mode);
+        }
+      },
+      {Mode::SetRc, Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull, Mode::Throw});
+  EXPECT_GT(tried, 200U);
+}
+
+// --- all, one, and paths
+
+TEST_F(DNSSettingDataObjectsTest, AllInstancesHoldsAPlaceForEachNodeAlsoWhereNoneCouldBeMade) {
+  world_->nic("eth1").install();
+  broker_.failNext("newObjectPath", Mode::ReturnNull);
+  std::vector<CMPIInstance*> instances;
+  EXPECT_EQ(0, getAllDNSSettingDataCMPIInstances(broker_.cmpi(), ref_, nullptr, &instances, &status_));
+  ASSERT_THAT(instances, SizeIs(2));
+  EXPECT_EQ(nullptr, instances[0]);
+  EXPECT_EQ(chars("Computer%eth1"), RecordingBroker::read(instances[1])["InstanceID"]);
+}
+
+TEST_F(DNSSettingDataObjectsTest, OneInstanceIsThatOfTheKeyAndEndsTheWalk) {
+  world_->nic("eth1", usualNic()).nic("eth2").install();
+  CMPIInstance* instance = nullptr;
+  const CMPIObjectPath* ref = broker_.make(Path(kClass).key("InstanceID", "Computer%eth1"), "ref");
+  EXPECT_EQ(0, getOneDNSSettingDataCMPIInstance(broker_.cmpi(), ref, nullptr, &instance, &status_));
+  EXPECT_EQ(chars("Computer%eth1"), RecordingBroker::read(instance)["InstanceID"]);
+  EXPECT_FALSE(lines().exited("getOneDNSSettingDataCMPIInstance"));
+  EXPECT_EQ(2U, logger_.pairs().ofFunction("operator bool").size());
+}
+
+TEST_F(DNSSettingDataObjectsTest, OneInstanceIsFoundByExactText) {
+  for (const char* key :
+       {"Computer%eth", "Computer%eth00", "computer%eth0", "eth0", "BMC%eth0", "Computer%eth0 ", ""}) {
+    CMPIInstance* instance = nullptr;
+    const CMPIObjectPath* ref = broker_.make(Path(kClass).key("InstanceID", key), "ref");
+    logger_.clear();
+    EXPECT_EQ(1, getOneDNSSettingDataCMPIInstance(broker_.cmpi(), ref, nullptr, &instance, &status_)) << key;
+    EXPECT_EQ(nullptr, instance);
+    EXPECT_TRUE(lines().exited("getOneDNSSettingDataCMPIInstance"));
+    EXPECT_THAT(lines().errors(), IsEmpty());
+  }
+}
+
+TEST_F(DNSSettingDataObjectsTest, OneInstanceThatCannotBeMadeIsASuccessWithNull) {
+  CMPIInstance* instance = nullptr;
+  const CMPIObjectPath* ref = broker_.make(Path(kClass).key("InstanceID", "Computer%eth0"), "ref");
+  broker_.failNext("newObjectPath", Mode::ReturnNull);
+  EXPECT_EQ(0, getOneDNSSettingDataCMPIInstance(broker_.cmpi(), ref, nullptr, &instance, &status_));
+  EXPECT_EQ(nullptr, instance);
+}
+
+TEST_F(DNSSettingDataObjectsTest, TheKeysFailuresAreLeftInTheStatus) {
+  const CMPIObjectPath* ref = broker_.make(Path(kClass).key("InstanceID", "Computer%eth0"), "ref");
+  for (const char* name : {"getKey", "getCharPtr"}) {
+    broker_.startOver();
+    broker_.failNext(name, Mode::RcAndNull);
+    status_.rc = CMPI_RC_OK;
+    CMPIInstance* instance = nullptr;
+    EXPECT_EQ(1, getOneDNSSettingDataCMPIInstance(broker_.cmpi(), ref, nullptr, &instance, &status_));
+    EXPECT_EQ(CMPI_RC_ERR_FAILED, status_.rc) << name;
+  }
+}
+
+TEST_F(DNSSettingDataObjectsTest, PathsHaveTheKeyTheNamespaceOfTheRequestAndThisHost) {
+  world_->bmc().nic("bmc0").install();
+  std::vector<CMPIObjectPath*> paths;
+  const CMPIObjectPath* ref = broker_.make(Path(kClass, "root/other").on("elsewhere"), "ref");
+  EXPECT_EQ(0, getAllDNSSettingDataCMPIObjectPaths(broker_.cmpi(), ref, &paths, &status_));
+  ASSERT_THAT(paths, SizeIs(2));
+  const Path path = Path(kClass, "root/other").on("host1");
+  EXPECT_EQ(path.key("InstanceID", chars("Computer%eth0")), RecordingBroker::read(paths[0]));
+  EXPECT_EQ(path.key("InstanceID", chars("BMC%bmc0")), RecordingBroker::read(paths[1]));
+}
+
+TEST_F(DNSSettingDataObjectsTest, APathOfANodeWithoutANameHasNoKey) {
+  newWorld().nic("x", {.isUnnamed = true}).install();
+  std::vector<CMPIObjectPath*> paths;
+  EXPECT_EQ(0, getAllDNSSettingDataCMPIObjectPaths(broker_.cmpi(), ref_, &paths, &status_));
+  ASSERT_THAT(paths, SizeIs(1));
+  EXPECT_EQ(Path(kClass).on("host1"), RecordingBroker::read(paths[0]));
+}
+
+TEST_F(DNSSettingDataObjectsTest, APathThatCannotBeMadeEndsTheWalkAndLeavesThoseBeforeIt) {
+  world_->nic("eth1").nic("eth2").install();
+  std::vector<CMPIObjectPath*> all;
+  getAllDNSSettingDataCMPIObjectPaths(broker_.cmpi(), ref_, &all, &status_);
+  const std::size_t second = placeOf("newObjectPath", 2);
+  for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
+    broker_.startOver();
+    logger_.clear();
+    broker_.failAt(second, mode);
+    std::vector<CMPIObjectPath*> paths;
+    EXPECT_EQ(1, getAllDNSSettingDataCMPIObjectPaths(broker_.cmpi(), ref_, &paths, &status_));
+    ASSERT_THAT(paths, SizeIs(1));
+    EXPECT_EQ("Computer%eth0", RecordingBroker::read(paths[0])["InstanceID"].text());
+    EXPECT_THAT(lines().errors(), ElementsAre("getAllDNSSettingDataCMPIObjectPaths failed"));
+    EXPECT_TRUE(lines().exited("getAllDNSSettingDataCMPIObjectPaths"));
+    EXPECT_EQ(CMPI_RC_OK, status_.rc);
+  }
+}
+
+TEST_F(DNSSettingDataObjectsTest, WithoutABrokerOrAPathNothingBreaks) {
+  std::vector<CMPIInstance*> instances;
+  std::vector<CMPIObjectPath*> paths;
+  CMPIInstance* one = nullptr;
+  EXPECT_EQ(0, getAllDNSSettingDataCMPIInstances(nullptr, ref_, nullptr, &instances, &status_));
+  EXPECT_THAT(instances, ElementsAre(nullptr));
+  EXPECT_EQ(1, getAllDNSSettingDataCMPIObjectPaths(nullptr, ref_, &paths, &status_));
+  EXPECT_EQ(1, getOneDNSSettingDataCMPIInstance(nullptr, nullptr, nullptr, &one, &status_));
+  EXPECT_EQ(0, getAllDNSSettingDataCMPIObjectPaths(broker_.cmpi(), nullptr, &paths, &status_));
+  EXPECT_THAT(paths, SizeIs(1));
+}
+
+}  // namespace
+}  // namespace ZV::Test

@@ -1,0 +1,309 @@
+// What all twelve providers have alike: create functions, function tables, and the operations that do no work.
+#include <ProviderCall.h>
+#include <World.h>
+#include <gmock/gmock.h>
+
+#include <set>
+
+#define INSTANCE_MI(prefix) \
+  extern "C" CMPIInstanceMI* prefix##_Create_InstanceMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
+#define ASSOCIATION_MI(prefix) \
+  extern "C" CMPIAssociationMI* prefix##_Create_AssociationMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
+
+INSTANCE_MI(DNSClientProvider)
+extern "C" CMPIMethodMI* DNSClientProvider_Create_MethodMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
+INSTANCE_MI(DNSRemoteServiceAccessPointProvider)
+INSTANCE_MI(DNSSettingDataProvider)
+INSTANCE_MI(DNSGeneralSettingDataProvider)
+INSTANCE_MI(DNSRemoteAccessAvailableToElementProvider)
+ASSOCIATION_MI(DNSRemoteAccessAvailableToElementProvider)
+INSTANCE_MI(DNSSAPSAPDependencyProvider)
+ASSOCIATION_MI(DNSSAPSAPDependencyProvider)
+INSTANCE_MI(DNSHostedAccessPointProvider)
+ASSOCIATION_MI(DNSHostedAccessPointProvider)
+INSTANCE_MI(DNSGeneralElementSettingDataProvider)
+ASSOCIATION_MI(DNSGeneralElementSettingDataProvider)
+INSTANCE_MI(DNSGenEndPointElementSettingDataProvider)
+ASSOCIATION_MI(DNSGenEndPointElementSettingDataProvider)
+INSTANCE_MI(DNSEndPointElementSettingDataProvider)
+ASSOCIATION_MI(DNSEndPointElementSettingDataProvider)
+INSTANCE_MI(DNSGeneralOrderedComponentProvider)
+ASSOCIATION_MI(DNSGeneralOrderedComponentProvider)
+INSTANCE_MI(DNSOrderedComponentProvider)
+ASSOCIATION_MI(DNSOrderedComponentProvider)
+
+namespace ZV::Test {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+
+// A provider by the names that the outside and the log know it by. The names differ in places, and so they shall.
+struct Provider {
+  InstanceProvider::Create create;
+  AssociationProvider::Create createAssociation;  // null: it has none
+  const char* prefix;
+  const char* stem;
+  const char* source;
+  const char* className;
+};
+
+void PrintTo(const Provider& provider, std::ostream* out) { *out << provider.prefix; }
+
+#define PLAIN(prefix) prefix##_Create_InstanceMI, nullptr, #prefix
+#define BOTH(prefix) prefix##_Create_InstanceMI, prefix##_Create_AssociationMI, #prefix
+
+const Provider kProviders[] = {
+    {PLAIN(DNSClientProvider), "DNSClient", "DNSClientProvider", "ZORVA_DNSProtocolEndPoint"},
+    {PLAIN(DNSRemoteServiceAccessPointProvider), "DNSRemoteServiceAccessPoint", "DNSRemoteServiceAccessPointProvider",
+     "ZORVA_RemoteServiceAccessPoint"},
+    {PLAIN(DNSSettingDataProvider), "DNSSettingData", "DNSSettingDataProvider", "ZORVA_DNSSettingData"},
+    {PLAIN(DNSGeneralSettingDataProvider), "DNSGeneralSettingData", "DNSGeneralSettingDataProvider",
+     "ZORVA_DNSGeneralSettingData"},
+    {BOTH(DNSRemoteAccessAvailableToElementProvider), "DNSRemoteAccessAvailableToElement",
+     "DNSRemoteAccessAvailableToElementProvider", "ZORVA_RemoteAccessAvailableToElement"},
+    {BOTH(DNSSAPSAPDependencyProvider), "DNSSAPSAPDependency", "DNSSAPSAPDependencyProvider",
+     "ZORVA_DNSSAPSAPDependency"},
+    {BOTH(DNSHostedAccessPointProvider), "DNSHostedAccessPoint", "DNSHostedAccessPointProvider",
+     "ZORVA_DNSHostedAccessPoint"},
+    {BOTH(DNSGeneralElementSettingDataProvider), "DNSGeneralElementSettingData", "DNSGeneralElementSettingDataProvider",
+     "ZORVA_DNSGeneralElementSettingData"},
+    {BOTH(DNSGenEndPointElementSettingDataProvider), "DNSGenEndpointElementSettingData",
+     "DNSGenEndpointElementSettingDataProvider", "ZORVA_DNSGenEndPointElementSettingData"},
+    {BOTH(DNSEndPointElementSettingDataProvider), "DNSEndpointElementSettingData",
+     "DNSEndpointElementSettingDataProvider", "ZORVA_DNSEndPointElementSettingData"},
+    {BOTH(DNSGeneralOrderedComponentProvider), "DNSGeneralOrderedComponent", "DNSGenOrderedComponentProvider",
+     "ZORVA_DNSGenOrderedComponent"},
+    {BOTH(DNSOrderedComponentProvider), "DNSOrderedComponent", "DNSOrderedComponentProvider",
+     "ZORVA_DNSOrderedComponent"},
+};
+
+bool isModifiable(const Provider& provider) {
+  return std::set<std::string>{"DNSClient", "DNSSettingData", "DNSGeneralSettingData"}.contains(provider.stem);
+}
+
+// The source's name, but for the one whose category keeps the long word.
+std::string categoryOf(const Provider& provider) {
+  const std::string source = provider.source;
+  return "Zorvagent." + (source == "DNSGenOrderedComponentProvider" ? "DNSGeneralOrderedComponentProvider" : source);
+}
+
+// Did nothing, and said nothing.
+void expectNoWork(const Outcome& outcome, CMPIrc rc) {
+  EXPECT_EQ(rc, outcome.rc);
+  EXPECT_EQ(std::nullopt, outcome.message);
+  EXPECT_THAT(outcome.calls, IsEmpty());
+  EXPECT_THAT(outcome.lines, IsEmpty());
+}
+
+class EveryProvider : public ::testing::TestWithParam<Provider> {
+ protected:
+  static Path path() { return Path(GetParam().className); }
+
+  RecordingLogger logger;
+  RecordingBroker broker;
+};
+
+class EveryAssociationProvider : public EveryProvider {};
+
+TEST_P(EveryProvider, IsMadeWithoutAStatusOrAContext) {
+  ASSERT_NE(nullptr, GetParam().create(broker.cmpi(), nullptr, nullptr));
+  EXPECT_EQ(0U, broker.callCount());
+  EXPECT_EQ(0U, logger.size());
+}
+
+TEST_P(EveryProvider, LeavesTheStatusOfItsCreationUntouched) {
+  CMPIStatus status{CMPI_RC_ERR_FAILED, broker.makeString("before")};
+  const CMPIString* const before = status.msg;
+  GetParam().create(broker.cmpi(), broker.makeContext(), &status);
+  EXPECT_EQ(CMPI_RC_ERR_FAILED, status.rc);
+  EXPECT_EQ(before, status.msg);
+}
+
+TEST_P(EveryProvider, HandsOutOneTableForEver) {
+  CMPIInstanceMI* const mi = GetParam().create(broker.cmpi(), nullptr, nullptr);
+  EXPECT_EQ(nullptr, mi->hdl);
+  EXPECT_EQ(200, mi->ft->ftVersion);
+  EXPECT_EQ(200, mi->ft->miVersion);
+  EXPECT_EQ("instance" + std::string(GetParam().prefix), mi->ft->miName);
+  EXPECT_EQ(mi, GetParam().create(broker.cmpi(), nullptr, nullptr));
+}
+
+TEST_P(EveryProvider, HasNothingToCleanUp) {
+  InstanceProvider provider(GetParam().create, broker);
+  expectNoWork(provider.cleanup(true), CMPI_RC_OK);
+  expectNoWork(provider.cleanup(false), CMPI_RC_OK);
+}
+
+TEST_P(EveryProvider, RefusesToMakeDeleteOrQuery) {
+  InstanceProvider provider(GetParam().create, broker);
+  expectNoWork(provider.createInstance(path(), Instance(GetParam().className)), CMPI_RC_ERR_NOT_SUPPORTED);
+  expectNoWork(provider.deleteInstance(path()), CMPI_RC_ERR_NOT_SUPPORTED);
+  expectNoWork(provider.execQuery(path(), "SELECT * FROM X", "CIM:CQL"), CMPI_RC_ERR_NOT_SUPPORTED);
+}
+
+TEST_P(EveryProvider, RefusesModificationUnlessItIsOneOfThree) {
+  World world;
+  world.host().install();
+  InstanceProvider provider(GetParam().create, broker);
+  const Outcome outcome = provider.modifyInstance(path(), Instance(GetParam().className));
+  if (isModifiable(GetParam())) {
+    EXPECT_TRUE(outcome.markedEntry());
+  } else {
+    expectNoWork(outcome, CMPI_RC_ERR_NOT_SUPPORTED);
+  }
+}
+
+TEST_P(EveryProvider, RefusedOperationsUseNoneOfTheirArguments) {
+  CMPIInstanceMI* const mi = GetParam().create(nullptr, nullptr, nullptr);
+  EXPECT_EQ(CMPI_RC_OK, mi->ft->cleanup(nullptr, nullptr, 0).rc);
+  EXPECT_EQ(CMPI_RC_ERR_NOT_SUPPORTED, mi->ft->createInstance(nullptr, nullptr, nullptr, nullptr, nullptr).rc);
+  EXPECT_EQ(CMPI_RC_ERR_NOT_SUPPORTED, mi->ft->deleteInstance(nullptr, nullptr, nullptr, nullptr).rc);
+  EXPECT_EQ(CMPI_RC_ERR_NOT_SUPPORTED, mi->ft->execQuery(nullptr, nullptr, nullptr, nullptr, nullptr, nullptr).rc);
+}
+
+TEST_P(EveryProvider, OpensItsOperationsUnderItsOwnNameAndCategory) {
+  World world;
+  world.host().install();
+  InstanceProvider provider(GetParam().create, broker);
+  const std::string stem = GetParam().stem;
+  const std::string file = "providers/" + std::string(GetParam().source) + ".cpp";
+  const std::pair<std::string, Outcome> operations[] = {
+      {"_EnumInstanceNames", provider.enumerateInstanceNames(path())},
+      {"_EnumInstances", provider.enumerateInstances(path())},
+      {"_GetInstance", provider.getInstance(path().key("Name", "x"))}};
+  for (const auto& [operation, outcome] : operations) {
+    EXPECT_TRUE(outcome.markedEntry()) << operation;
+    EXPECT_TRUE(outcome.lines.entered(stem + operation, file)) << outcome;
+    EXPECT_EQ(categoryOf(GetParam()), outcome.lines.at(1).category);
+  }
+}
+
+TEST_P(EveryProvider, LatestCreationsBrokerServesAllItsTables) {
+  World world;
+  world.nic("eth0", usualNic()).install();
+  InstanceProvider provider(GetParam().create, broker);
+  RecordingBroker later;
+  if (GetParam().createAssociation != nullptr) {
+    const AssociationProvider other(GetParam().createAssociation, later);
+  } else {
+    const InstanceProvider other(GetParam().create, later);
+  }
+  provider.enumerateInstances(path());
+  EXPECT_EQ(0U, broker.callsOf("newObjectPath"));
+  EXPECT_LT(0U, later.callsOf("newObjectPath"));
+}
+
+TEST_P(EveryAssociationProvider, HandsOutItsTable) {
+  CMPIStatus status{CMPI_RC_ERR_FAILED, nullptr};
+  CMPIAssociationMI* const mi = GetParam().createAssociation(broker.cmpi(), nullptr, &status);
+  EXPECT_EQ(CMPI_RC_ERR_FAILED, status.rc);
+  EXPECT_EQ(nullptr, mi->hdl);
+  EXPECT_EQ(200, mi->ft->ftVersion);
+  EXPECT_EQ(200, mi->ft->miVersion);
+  EXPECT_EQ("association" + std::string(GetParam().prefix), mi->ft->miName);
+  EXPECT_EQ(mi, GetParam().createAssociation(broker.cmpi(), nullptr, nullptr));
+}
+
+TEST_P(EveryAssociationProvider, HasNothingToCleanUpEither) {
+  AssociationProvider provider(GetParam().createAssociation, broker);
+  expectNoWork(provider.cleanup(true), CMPI_RC_OK);
+  expectNoWork(provider.cleanup(false), CMPI_RC_OK);
+}
+
+TEST_P(EveryAssociationProvider, OpensItsOperationsUnderItsOwnNameAndCategory) {
+  World world;
+  world.host().install();
+  AssociationProvider provider(GetParam().createAssociation, broker);
+  const std::string stem = GetParam().stem;
+  const std::string file = "providers/" + std::string(GetParam().source) + ".cpp";
+  const Path unknown = Path("ZORVA_Unknown");
+  const std::pair<std::string, Outcome> operations[] = {{"_Associators", provider.associators(unknown, {})},
+                                                        {"_AssociatorNames", provider.associatorNames(unknown, {})},
+                                                        {"_References", provider.references(unknown)},
+                                                        {"_ReferenceNames", provider.referenceNames(unknown)}};
+  for (const auto& [operation, outcome] : operations) {
+    EXPECT_TRUE(outcome.markedEntry()) << operation;
+    EXPECT_TRUE(outcome.lines.entered(stem + operation, file)) << outcome;
+    EXPECT_EQ(categoryOf(GetParam()), outcome.lines.at(1).category);
+  }
+}
+
+TEST_P(EveryAssociationProvider, LatestCreationsBrokerServesBothTables) {
+  World world;
+  world.nic("eth0", usualNic()).install();
+  AssociationProvider provider(GetParam().createAssociation, broker);
+  RecordingBroker later;
+  InstanceProvider other(GetParam().create, later);
+  other.enumerateInstances(path());
+  EXPECT_LT(0U, later.callCount());
+  EXPECT_EQ(0U, broker.callCount());
+}
+
+std::string nameOfProvider(const ::testing::TestParamInfo<Provider>& row) { return row.param.stem; }
+
+std::vector<Provider> associationProviders() {
+  std::vector<Provider> some;
+  for (const Provider& provider : kProviders) {
+    if (provider.createAssociation != nullptr) some.push_back(provider);
+  }
+  return some;
+}
+
+INSTANTIATE_TEST_SUITE_P(Of, EveryProvider, ::testing::ValuesIn(kProviders), nameOfProvider);
+INSTANTIATE_TEST_SUITE_P(Of, EveryAssociationProvider, ::testing::ValuesIn(associationProviders()), nameOfProvider);
+
+TEST(ProviderFrame, TwelveProvidersHaveEightAssociations) {
+  EXPECT_EQ(12U, std::size(kProviders));
+  EXPECT_EQ(8U, associationProviders().size());
+}
+
+TEST(MethodProviderOfTheEndpoint, HandsOutItsTable) {
+  RecordingBroker broker;
+  CMPIMethodMI* const mi = DNSClientProvider_Create_MethodMI(broker.cmpi(), nullptr, nullptr);
+  EXPECT_EQ(nullptr, mi->hdl);
+  EXPECT_EQ(200, mi->ft->ftVersion);
+  EXPECT_EQ(200, mi->ft->miVersion);
+  EXPECT_STREQ("methodDNSClientProvider", mi->ft->miName);
+  CMPIStatus status{CMPI_RC_ERR_FAILED, nullptr};
+  EXPECT_EQ(mi, DNSClientProvider_Create_MethodMI(broker.cmpi(), nullptr, &status));
+  EXPECT_EQ(CMPI_RC_ERR_FAILED, status.rc);
+}
+
+TEST(MethodProviderOfTheEndpoint, DoesNotSupportItsCleanup) {
+  const RecordingLogger logger;
+  RecordingBroker broker;
+  MethodProvider provider(DNSClientProvider_Create_MethodMI, broker);
+  expectNoWork(provider.cleanup(true), CMPI_RC_ERR_NOT_SUPPORTED);
+  expectNoWork(provider.cleanup(false), CMPI_RC_ERR_NOT_SUPPORTED);
+  EXPECT_EQ(CMPI_RC_ERR_NOT_SUPPORTED, provider.mi()->ft->cleanup(nullptr, nullptr, 1).rc);
+}
+
+TEST(MethodProviderOfTheEndpoint, SharesTheBrokerOfItsInstanceTable) {
+  World world;
+  world.nic("eth0", usualNic()).install();
+  RecordingBroker broker;
+  RecordingBroker later;
+  InstanceProvider instances(DNSClientProvider_Create_InstanceMI, broker);
+  const MethodProvider methods(DNSClientProvider_Create_MethodMI, later);
+  instances.enumerateInstances(Path("ZORVA_DNSProtocolEndPoint"));
+  EXPECT_EQ(1U, later.callsOf("newInstance"));
+  EXPECT_EQ(0U, broker.callsOf("newInstance"));
+}
+
+TEST(SharedCategory, GeneralSettingDataLogsAsItsSiblingDoes) {
+  World world;
+  world.nic("eth0", usualNic()).install();
+  const RecordingLogger logger;
+  RecordingBroker broker;
+  InstanceProvider general(DNSGeneralSettingDataProvider_Create_InstanceMI, broker);
+  const LogLines lines = general.enumerateInstances(Path("ZORVA_DNSGeneralSettingData")).lines;
+  std::set<std::string> categories;
+  for (const LogLine& line : lines) {
+    if (line.file == "settings/DNSGeneralSettingData.cpp") categories.insert(line.category);
+  }
+  EXPECT_THAT(categories, ElementsAre("Zorvagent.DNSSettingDataProvider"));
+}
+
+}  // namespace
+}  // namespace ZV::Test

@@ -1,0 +1,136 @@
+// The four associations of DNS settings as their tests share them: who they are, and what a host no test can write down
+// would make of the fetches below them.
+#pragma once
+
+#include <functional>
+#include <vector>
+
+#include "AssociationTestSupport.h"
+
+extern "C" {
+CMPIInstanceMI* DNSGenEndPointElementSettingDataProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*,
+                                                                           CMPIStatus*);
+CMPIAssociationMI* DNSGenEndPointElementSettingDataProvider_Create_AssociationMI(const CMPIBroker*, const CMPIContext*,
+                                                                                 CMPIStatus*);
+CMPIInstanceMI* DNSEndPointElementSettingDataProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*,
+                                                                        CMPIStatus*);
+CMPIAssociationMI* DNSEndPointElementSettingDataProvider_Create_AssociationMI(const CMPIBroker*, const CMPIContext*,
+                                                                              CMPIStatus*);
+CMPIInstanceMI* DNSGeneralOrderedComponentProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*,
+                                                                     CMPIStatus*);
+CMPIAssociationMI* DNSGeneralOrderedComponentProvider_Create_AssociationMI(const CMPIBroker*, const CMPIContext*,
+                                                                           CMPIStatus*);
+CMPIInstanceMI* DNSOrderedComponentProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
+CMPIAssociationMI* DNSOrderedComponentProvider_Create_AssociationMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
+}
+
+namespace ZV::Test {
+
+inline AssociationUnderTest genEndpointElementSettingData() {
+  return {.className = "ZORVA_DNSGenEndPointElementSettingData",
+          .left = "ManagedElement",
+          .right = "SettingData",
+          .stem = "DNSGenEndpointElementSettingData",
+          .builder = "DNSGenEndpointElementSettingDataCMPIInstances",
+          .source = "providers/DNSGenEndpointElementSettingDataProvider.cpp",
+          .category = "Zorvagent.DNSGenEndpointElementSettingDataProvider",
+          .createInstanceMI = DNSGenEndPointElementSettingDataProvider_Create_InstanceMI,
+          .createAssociationMI = DNSGenEndPointElementSettingDataProvider_Create_AssociationMI,
+          .associationsAreDone = true};
+}
+
+inline AssociationUnderTest endpointElementSettingData() {
+  return {.className = "ZORVA_DNSEndPointElementSettingData",
+          .left = "ManagedElement",
+          .right = "SettingData",
+          .stem = "DNSEndpointElementSettingData",
+          .builder = "DNSEndpointElementSettingDataCMPIInstances",
+          .source = "providers/DNSEndpointElementSettingDataProvider.cpp",
+          .category = "Zorvagent.DNSEndpointElementSettingDataProvider",
+          .createInstanceMI = DNSEndPointElementSettingDataProvider_Create_InstanceMI,
+          .createAssociationMI = DNSEndPointElementSettingDataProvider_Create_AssociationMI,
+          .associationsAreDone = true};
+}
+
+inline AssociationUnderTest generalOrderedComponent() {
+  return {.className = "ZORVA_DNSGenOrderedComponent",
+          .left = "GroupComponent",
+          .right = "PartComponent",
+          .stem = "DNSGeneralOrderedComponent",
+          .builder = "DNSGeneralOrderedComponentCMPIInstances",
+          .source = "providers/DNSGenOrderedComponentProvider.cpp",
+          .category = "Zorvagent.DNSGeneralOrderedComponentProvider",
+          .createInstanceMI = DNSGeneralOrderedComponentProvider_Create_InstanceMI,
+          .createAssociationMI = DNSGeneralOrderedComponentProvider_Create_AssociationMI,
+          .associationsAreDone = true};
+}
+
+inline AssociationUnderTest orderedComponent() {
+  return {.className = "ZORVA_DNSOrderedComponent",
+          .left = "GroupComponent",
+          .right = "PartComponent",
+          .stem = "DNSOrderedComponent",
+          .builder = "DNSOrderedComponentCMPIInstances",
+          .source = "providers/DNSOrderedComponentProvider.cpp",
+          .category = "Zorvagent.DNSOrderedComponentProvider",
+          .createInstanceMI = DNSOrderedComponentProvider_Create_InstanceMI,
+          .createAssociationMI = DNSOrderedComponentProvider_Create_AssociationMI,
+          .associationsAreDone = true};
+}
+
+inline const char* const kGeneralSettingClass = "ZORVA_DNSGeneralSettingData";
+inline const char* const kSettingClass = "ZORVA_DNSSettingData";
+inline const char* const kEndpointClass = "ZORVA_DNSProtocolEndPoint";
+inline const char* const kIpAssignmentClass = "ZORVA_IPAssignmentSettingData";
+
+// --- Parts of a story.
+
+inline std::string inRootCimv2(const std::string& path) { return path + ".setNameSpace(\"root/cimv2\")"; }
+
+inline Story newSettingPath(const std::string& path, const std::string& instanceID) {
+  return tell({newHostPath(path, kSettingClass), textKeys(path, {{"InstanceID", instanceID}})});
+}
+
+// A setting with its key alone, asked for by that name.
+inline Story newSetting(const std::string& path, const std::string& instance, const std::string& className,
+                        const std::string& instanceID) {
+  return tell({newHostPath(path, className),
+               {"newInstance(" + path + ")", instance + R"(.setPropertyFilter({"InstanceID"}, {"InstanceID"}))"},
+               textProperties(instance, {{"InstanceID", instanceID}})});
+}
+
+inline Story flags(const std::string& instance, int value) {
+  const std::string number = ", uint16 " + std::to_string(value) + ")";
+  return {instance + R"(.setProperty("IsCurrent")" + number, instance + R"(.setProperty("IsDefault")" + number};
+}
+
+inline Story sequence(const std::string& instance, int value) {
+  return {instance + R"(.setProperty("AssignedSequence", uint64 )" + std::to_string(value) + ")"};
+}
+
+// What a result goes out with, after its path was asked of the broker.
+inline Story returnedPath(const std::string& instance, const std::string& path, bool isPlaced) {
+  return tell({{instance + ".getObjectPath()"},
+               isPlaced ? Story{inRootCimv2(path)} : Story(),
+               {"returnObjectPath(" + path + ")"}});
+}
+
+inline Story done(const std::string& operation) { return tell({{"returnDone()"}, exitMark(operation)}); }
+
+// --- Fetches.
+
+// As long as it lives, it may change what a fetch of settings gave, and what the fetch answers: for answers that the
+// real ones never give. What is not set leaves its fetch alone. One at a time.
+class FetchHook {
+ public:
+  FetchHook();
+  ~FetchHook();
+  FetchHook(const FetchHook&) = delete;
+  FetchHook& operator=(const FetchHook&) = delete;
+
+  std::function<unsigned short(std::vector<CMPIObjectPath*>&)> generalSettingPaths;
+  std::function<unsigned short(std::vector<CMPIInstance*>&)> generalSettings;
+  std::function<unsigned short(std::vector<CMPIInstance*>&)> settings;
+};
+
+}  // namespace ZV::Test
