@@ -108,11 +108,9 @@ inline Story sequence(const std::string& instance, int value) {
   return {instance + R"(.setProperty("AssignedSequence", uint64 )" + std::to_string(value) + ")"};
 }
 
-// What a result goes out with, after its path was asked of the broker.
-inline Story returnedPath(const std::string& instance, const std::string& path, bool isPlaced) {
-  return tell({{instance + ".getObjectPath()"},
-               isPlaced ? Story{inRootCimv2(path)} : Story(),
-               {"returnObjectPath(" + path + ")"}});
+// The name of a reference goes out with the namespace of the source.
+inline Story returnedPath(const std::string& instance, const std::string& path) {
+  return {instance + ".getObjectPath()", inRootCimv2(path), "returnObjectPath(" + path + ")"};
 }
 
 inline Story done(const std::string& operation) { return tell({{"returnDone()"}, exitMark(operation)}); }

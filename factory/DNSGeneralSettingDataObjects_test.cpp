@@ -1,0 +1,298 @@
+#include "factory/DNSGeneralSettingDataObjects.h"
+
+#include <gmock/gmock.h>
+
+#include <memory>
+
+#include "ProviderCall.h"
+#include "World.h"
+
+namespace ZV::Test {
+namespace {
+
+using std::string_literals::operator""s;
+using ::testing::Contains;
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+using ::testing::Not;
+using ::testing::SizeIs;
+
+constexpr const char* kClass = "ZORVA_DNSGeneralSettingData";
+constexpr const char* kLogger = "Zorvagent.DNSObjFactory";
+
+const std::vector<std::string> kAllProperties = {"InstanceID",        "Caption",       "Description",        "ElementName",
+                                                 "ConfigurationName", "AddressOrigin", "DNSSuffixesToAppend"};
+
+using Instances = std::vector<CMPIInstance*>;
+using Paths = std::vector<CMPIObjectPath*>;
+
+class DNSGeneralSettingDataObjectsTest : public ::testing::Test {
+ protected:
+  DNSGeneralSettingDataObjectsTest() { world_->host("myhost").nic("eth0", usualNic()).install(); }
+
+  // A host without anything in the place of the one with a usual interface.
+  World& newWorld() {
+    world_.reset();
+    world_ = std::make_unique<World>();
+    return *world_;
+  }
+  CMPIInstance* make(PropertyList properties = nullptr, bool isObjPath = false) {
+    DNSGeneralSettingData data;
+    EXPECT_TRUE(static_cast<bool>(data));
+    logger_.clear();
+    return makeDNSGeneralSettingDataInstance(broker_.cmpi(), ref_, data, properties.cmpi(), isObjPath, &status_);
+  }
+  Instance made(PropertyList properties = nullptr, bool isObjPath = false) {
+    return RecordingBroker::read(make(std::move(properties), isObjPath));
+  }
+  LogLines lines() const { return logger_.pairs().ofCategory(kLogger); }
+
+  std::unique_ptr<World> world_ = std::make_unique<World>();
+  RecordingLogger logger_;
+  RecordingBroker broker_;
+  CMPIObjectPath* ref_ = broker_.make(Path(kClass), "ref");
+  CMPIStatus status_ = {CMPI_RC_OK, nullptr};
+};
+
+// --- which properties
+
+TEST_F(DNSGeneralSettingDataObjectsTest, TheListAndTheFlagChooseTheProperties) {
+  const std::vector<std::string> key = {"InstanceID"};
+  EXPECT_EQ(kAllProperties, made(nullptr, false).names());
+  EXPECT_EQ(key, made(nullptr, true).names());
+  EXPECT_EQ(key, made({}, false).names());
+  EXPECT_EQ(key, made({}, true).names());
+  EXPECT_EQ(key, made({"caption", "NoSuchProperty"}).names());
+  for (const bool isObjPath : {false, true}) {
+    EXPECT_THAT(made({"ConfigurationName", "Caption"}, isObjPath).names(),
+                ElementsAre("InstanceID", "Caption", "ConfigurationName"));
+  }
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, EachPropertyCanBeAskedForAlone) {
+  for (const std::string& name : kAllProperties) {
+    const auto expected = name == "InstanceID" ? std::vector{name} : std::vector{"InstanceID"s, name};
+    EXPECT_EQ(expected, made({name}).names());
+  }
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, WhetherToAppendSuffixesIsNeverSet) {
+  EXPECT_THAT(made({"AppendPrimarySuffixes", "AppendParentSuffixes"}).names(), ElementsAre("InstanceID"));
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, TheFilterIsSetWhereMoreThanThePathIsWanted) {
+  make();
+  EXPECT_THAT(broker_.calls().lines(), Contains("I1.setPropertyFilter(null, {\"InstanceID\"})"));
+  broker_.startOver();
+  make(nullptr, true);
+  EXPECT_EQ(0U, broker_.callsOf("setPropertyFilter"));
+}
+
+// --- values
+
+TEST_F(DNSGeneralSettingDataObjectsTest, ValuesHaveTheTypesOfTheClass) {
+  world_->file("eth0", "CONFIG_NAME=office\nDNSSUFFIXES=a.example.org b.example.org \n");
+  const Instance instance = made();
+  EXPECT_EQ(chars("dnsgen1:myhost"), instance["InstanceID"]);
+  EXPECT_EQ(chars("DNS General Configuration"), instance["Caption"]);
+  EXPECT_EQ(chars("Represents DNS General Configuration for DNS Protocol EndPoint"), instance["Description"]);
+  EXPECT_EQ(chars("DNSGeneralSettingData"), instance["ElementName"]);
+  EXPECT_EQ(chars("office"), instance["ConfigurationName"]);
+  EXPECT_EQ(uint16(2), instance["AddressOrigin"]);
+  EXPECT_EQ(texts({"a.example.org", "b.example.org"}), instance["DNSSuffixesToAppend"]);
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, WithoutAFileTheConfigurationNameIsEmptyAndTheSuffixesAreTheNodes) {
+  const Instance instance = made();
+  EXPECT_EQ(chars(""), instance["ConfigurationName"]);
+  EXPECT_EQ(texts({"example.org"}), instance["DNSSuffixesToAppend"]);
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, AnEmptyListOfSuffixesIsLeftOut) {
+  world_->file("eth0", "DNSSUFFIXES=\n");
+  EXPECT_FALSE(made().has("DNSSuffixesToAppend"));
+  newWorld().nic("eth0").install();
+  EXPECT_FALSE(made().has("DNSSuffixesToAppend"));
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, ANodeWithoutANameReadsTheFileWithoutOneAndKeepsTheInstanceID) {
+  newWorld().host("myhost").nic("x", {.isUnnamed = true}).install().file("", "CONFIG_NAME=nameless\n");
+  const Instance instance = made();
+  EXPECT_EQ(chars("dnsgen1:myhost"), instance["InstanceID"]);
+  EXPECT_EQ(chars("nameless"), instance["ConfigurationName"]);
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, SuffixesAreCountedInSixteenBits) {
+  std::string content = "DNSSUFFIXES=";
+  for (int i = 0; i < 65536 + 2; ++i) content += std::to_string(i) + " ";
+  world_->file("eth0", content + "\n");
+  EXPECT_EQ(texts({"0", "1"}), made()["DNSSuffixesToAppend"]);
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, EachSuffixIsTold) {
+  world_->file("eth0", "DNSSUFFIXES=a b \n");
+  make({"DNSSuffixesToAppend"});
+  const LogLines told = lines().ofKind(LineKind::Variable);
+  EXPECT_THAT(told.briefs(), ElementsAre("4000 VARIABLE dnsSuf = a", "4000 VARIABLE dnsSuf = b"));
+  EXPECT_EQ("makeDNSGeneralSettingDataInstance", told.at(0).function);
+  EXPECT_EQ("factory/DNSGeneralSettingDataObjects.cpp", told.at(0).file);
+}
+
+// --- failures of the broker
+
+TEST_F(DNSGeneralSettingDataObjectsTest, APathOrAnInstanceThatCannotBeMadeIsToldByNobody) {
+  for (const char* name : {"newObjectPath", "newInstance"}) {
+    for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
+      broker_.startOver();
+      broker_.failNext(name, mode);
+      const CMPIInstance* instance = make();
+      EXPECT_EQ(name == "newInstance"s && mode == Mode::NullHandle, instance != nullptr) << name << " " << nameOf(mode);
+      EXPECT_EQ(0U, broker_.callsOf("setProperty"));
+      EXPECT_THAT(lines().errors(), IsEmpty());
+      EXPECT_FALSE(lines().exited("makeDNSGeneralSettingDataInstance"));
+      EXPECT_EQ(CMPI_RC_OK, status_.rc);
+    }
+  }
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, PathAndInstanceAreMadeWithoutTheStatus) {
+  for (const char* name : {"newObjectPath", "newInstance", "getNameSpace"}) {
+    broker_.failNext(name, Mode::SetRc);
+    EXPECT_EQ(kAllProperties, made().names());
+    EXPECT_EQ(CMPI_RC_OK, status_.rc) << name;
+  }
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, AnArrayThatCannotBeMadeEndsTheWork) {
+  for (const Mode mode : {Mode::ReturnNull, Mode::RcAndNull}) {
+    broker_.failNext("newArray", mode);
+    EXPECT_THAT(made().names(), Not(Contains("DNSSuffixesToAppend")));
+    EXPECT_THAT(lines().errors(), ElementsAre("Create Array for Property DNSSuffixesToAppend failed."));
+    EXPECT_EQ("makeDNSGeneralSettingDataInstance", lines().back().function);
+    EXPECT_FALSE(lines().exited("makeDNSGeneralSettingDataInstance"));
+    EXPECT_EQ(mode == Mode::RcAndNull ? CMPI_RC_ERR_FAILED : CMPI_RC_OK, status_.rc);
+  }
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, ASuffixWhoseStringFailsLeavesItsElementUnset) {
+  world_->file("eth0", "DNSSUFFIXES=a b c \n");
+  for (const Mode mode : {Mode::SetRc, Mode::RcAndNull, Mode::ReturnNull}) {
+    broker_.failNext("newString", mode);
+    EXPECT_EQ(list(CMPI_stringA, {null(CMPI_string), text("b"), text("c")}), made()["DNSSuffixesToAppend"]);
+    EXPECT_THAT(lines().errors(), IsEmpty());
+    EXPECT_TRUE(lines().exited("makeDNSGeneralSettingDataInstance"));
+  }
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, WhateverTheBrokerFailsAtNothingBreaks) {
+  const CMPIObjectPath* ref = broker_.make(Path(kClass).key("InstanceID", "x"));
+  const std::size_t tried = forEachFailure(
+      broker_,
+      [&](std::size_t, Mode mode) {
+        Instances instances;
+        Paths paths;
+        try {
+          EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIInstances(broker_.cmpi(), ref, nullptr, &instances, &status_));
+          EXPECT_EQ(0, getOneDNSGeneralSettingDataCMPIInstance(broker_.cmpi(), ref, nullptr, &instances, &status_));
+          EXPECT_THAT(instances, SizeIs(2));
+          const auto failed = getAllDNSGeneralSettingDataCMPIObjectPaths(broker_.cmpi(), ref, &paths, &status_);
+          EXPECT_EQ(failed == 0, paths.size() == 1);
+        } catch (const InjectedFailure&) {
+          EXPECT_EQ(Mode::Throw, mode);
+        }
+      },
+      {Mode::SetRc, Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull, Mode::Throw});
+  EXPECT_GT(tried, 150U);
+}
+
+// --- all, one, and paths
+
+TEST_F(DNSGeneralSettingDataObjectsTest, ThereIsOneInstanceAndOnePathWhateverTheNumberOfInterfaces) {
+  world_->nic("eth1").nic("eth2").install();
+  Instances instances;
+  Paths paths;
+  EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIInstances(broker_.cmpi(), ref_, nullptr, &instances, &status_));
+  EXPECT_THAT(instances, SizeIs(1));
+  EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIObjectPaths(broker_.cmpi(), ref_, &paths, &status_));
+  EXPECT_THAT(paths, SizeIs(1));
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, ThePathHasTheKeyOfTheInstanceTheNamespaceOfTheRequestAndThisHost) {
+  Paths paths;
+  const CMPIObjectPath* ref = broker_.make(Path(kClass, "root/other").on("elsewhere"), "ref");
+  EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIObjectPaths(broker_.cmpi(), ref, &paths, &status_));
+  ASSERT_THAT(paths, SizeIs(1));
+  EXPECT_EQ(Path(kClass, "root/other").on("myhost").key("InstanceID", made()["InstanceID"]),
+            RecordingBroker::read(paths[0]));
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, WithoutAnInterfaceOfTheHostThereIsNeitherInstanceNorPath) {
+  newWorld().bmc().nic("bmc0", usualNic()).install();
+  Instances instances;
+  Paths paths;
+  EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIInstances(broker_.cmpi(), ref_, nullptr, &instances, &status_));
+  EXPECT_EQ(0, getOneDNSGeneralSettingDataCMPIInstance(broker_.cmpi(), ref_, nullptr, &instances, &status_));
+  EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIObjectPaths(broker_.cmpi(), ref_, &paths, &status_));
+  EXPECT_THAT(instances, IsEmpty());
+  EXPECT_THAT(paths, IsEmpty());
+  EXPECT_THAT(lines().errors(), IsEmpty());
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, TheKeyIsReadAndComparedWithNothing) {
+  for (const Path& path : {Path(kClass).key("InstanceID", "dnsgen1:elsewhere"), Path(kClass).key("InstanceID", ""),
+                           Path(kClass)}) {
+    Instances instances;
+    broker_.startOver();
+    const CMPIObjectPath* ref = broker_.make(path, "ref");
+    EXPECT_EQ(0, getOneDNSGeneralSettingDataCMPIInstance(broker_.cmpi(), ref, nullptr, &instances, &status_));
+    EXPECT_EQ("ref.getKey(\"InstanceID\")", broker_.calls().lines().at(0));
+    ASSERT_THAT(instances, SizeIs(1));
+    EXPECT_EQ(chars("dnsgen1:myhost"), RecordingBroker::read(instances[0])["InstanceID"]);
+    EXPECT_TRUE(lines().exited("getOneDNSGeneralSettingDataCMPIInstance"));
+  }
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, AnInstanceThatCannotBeMadeStandsInTheResultAsNull) {
+  Instances instances;
+  broker_.failEach("newObjectPath", Mode::ReturnNull);
+  EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIInstances(broker_.cmpi(), ref_, nullptr, &instances, &status_));
+  EXPECT_EQ(0, getOneDNSGeneralSettingDataCMPIInstance(broker_.cmpi(), ref_, nullptr, &instances, &status_));
+  EXPECT_THAT(instances, ElementsAre(nullptr, nullptr));
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, APathThatCannotBeMadeIsTold) {
+  for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
+    logger_.clear();
+    broker_.failNext("newObjectPath", mode);
+    Paths paths;
+    EXPECT_EQ(1, getAllDNSGeneralSettingDataCMPIObjectPaths(broker_.cmpi(), ref_, &paths, &status_));
+    EXPECT_THAT(paths, IsEmpty());
+    EXPECT_THAT(lines().errors(), ElementsAre("getAllDNSGeneralSettingDataCMPIObjectPaths failed"));
+    EXPECT_TRUE(lines().exited("getAllDNSGeneralSettingDataCMPIObjectPaths"));
+    EXPECT_EQ(CMPI_RC_OK, status_.rc);
+  }
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, ATreeThatCannotBeReadIsAHostWithoutInterfaces) {
+  world_->installUnreadable();
+  Instances instances;
+  Paths paths;
+  EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIInstances(broker_.cmpi(), ref_, nullptr, &instances, &status_));
+  EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIObjectPaths(broker_.cmpi(), ref_, &paths, &status_));
+  EXPECT_THAT(instances, IsEmpty());
+  EXPECT_THAT(paths, IsEmpty());
+  EXPECT_THAT(logger_.pairs().errors(),
+              ElementsAre("Select Node for NetworkIPConfig failed", "Select Node for NetworkIPConfig failed"));
+}
+
+TEST_F(DNSGeneralSettingDataObjectsTest, WithoutABrokerOrAPathNothingBreaks) {
+  Instances instances;
+  Paths paths;
+  EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIInstances(nullptr, ref_, nullptr, &instances, &status_));
+  EXPECT_EQ(0, getOneDNSGeneralSettingDataCMPIInstance(broker_.cmpi(), nullptr, nullptr, &instances, &status_));
+  EXPECT_THAT(instances, SizeIs(2));
+  EXPECT_EQ(1, getAllDNSGeneralSettingDataCMPIObjectPaths(nullptr, ref_, &paths, &status_));
+}
+
+}  // namespace
+}  // namespace ZV::Test
