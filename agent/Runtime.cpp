@@ -146,8 +146,10 @@ std::string Runtime::systemName() {
   if (!loaded.config.systemName.empty()) return loaded.config.systemName;
   if (loaded.error.has_value()) return kernelName();
   try {
-    const std::string& name = look()->systemName();
-    return name.empty() ? kernelName() : name;
+    // Of the tree that the latest cursor was placed in: a name is told many times in one operation, and must not change
+    // on the way.
+    const std::shared_ptr<const TreeSnapshot> tree = latest();
+    return tree->systemName().empty() ? kernelName() : tree->systemName();
   } catch (...) {
     return kernelName();
   }

@@ -38,14 +38,14 @@ std::vector<std::string> candidates(const std::string& directory, const std::str
 ProviderLoader::ProviderLoader(BrokerCore& core, const ProviderRegistry& registry, std::string directory)
     : core_(core), directory_(std::move(directory)) {
   for (const ProviderEntry& entry : registry.entries()) {
-    const bool known = std::any_of(providers_.begin(), providers_.end(), [&](const auto& provider) {
+    auto known = std::find_if(providers_.begin(), providers_.end(), [&](const auto& provider) {
       return provider->prefix == entry.prefix && provider->library == entry.library;
     });
-    if (known) continue;
-    providers_.push_back(std::make_unique<Provider>());
-    providers_.back()->prefix = entry.prefix;
-    providers_.back()->library = entry.library;
-    providers_.back()->nameSpace = entry.nameSpace;
+    if (known == providers_.end()) known = providers_.insert(known, std::make_unique<Provider>());
+    (*known)->prefix = entry.prefix;
+    (*known)->library = entry.library;
+    (*known)->nameSpace = entry.nameSpace;
+    (*known)->kinds |= entry.kinds;
   }
 }
 
@@ -98,10 +98,26 @@ ProviderLoader::Library* ProviderLoader::open(const std::string& name, Status& s
 }
 
 template <class Mi>
-const Mi* ProviderLoader::make(Provider& provider, std::atomic<const Mi*> Provider::*slot, const char* kind,
+const Mi* ProviderLoader::find(const ProviderEntry& entry, std::atomic<const Mi*> Provider::*slot, const char* kind,
                                Status& status) {
+  Provider& provider = providerOf(entry);
   if (const Mi* made = (provider.*slot).load(std::memory_order_acquire)) return made;
   const std::lock_guard lock(mutex_);
+  const Mi* made = make(provider, slot, kind, status);
+  if (made != nullptr) makeAll(provider);
+  return made;
+}
+
+void ProviderLoader::makeAll(Provider& provider) {
+  Status unheeded;  // a kind that cannot be made is told to who asks for it
+  if ((provider.kinds & InstanceMi) != 0) make(provider, &Provider::instance, "InstanceMI", unheeded);
+  if ((provider.kinds & AssociationMi) != 0) make(provider, &Provider::association, "AssociationMI", unheeded);
+  if ((provider.kinds & MethodMi) != 0) make(provider, &Provider::method, "MethodMI", unheeded);
+}
+
+template <class Mi>
+const Mi* ProviderLoader::make(Provider& provider, std::atomic<const Mi*> Provider::*slot, const char* kind,
+                               Status& status) {
   if (const Mi* made = (provider.*slot).load(std::memory_order_relaxed)) return made;
   Library* library = open(provider.library, status);
   if (library == nullptr) return nullptr;
@@ -135,15 +151,15 @@ const Mi* ProviderLoader::make(Provider& provider, std::atomic<const Mi*> Provid
 }
 
 const CMPIInstanceMI* ProviderLoader::instanceMi(const ProviderEntry& entry, Status& status) {
-  return make(providerOf(entry), &Provider::instance, "InstanceMI", status);
+  return find(entry, &Provider::instance, "InstanceMI", status);
 }
 
 const CMPIAssociationMI* ProviderLoader::associationMi(const ProviderEntry& entry, Status& status) {
-  return make(providerOf(entry), &Provider::association, "AssociationMI", status);
+  return find(entry, &Provider::association, "AssociationMI", status);
 }
 
 const CMPIMethodMI* ProviderLoader::methodMi(const ProviderEntry& entry, Status& status) {
-  return make(providerOf(entry), &Provider::method, "MethodMI", status);
+  return find(entry, &Provider::method, "MethodMI", status);
 }
 
 }  // namespace zorva::broker

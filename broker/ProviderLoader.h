@@ -12,7 +12,9 @@
 #include "cmpidt.h"
 #include "cmpift.h"
 
-// Loads provider libraries when the first request needs them, and makes each provider's MIs once. Safe on any thread.
+// Loads provider libraries when the first request needs them, and makes each provider's MIs once, all kinds of one
+// provider together: its create functions store the broker where its operations read it, without a lock, and so none
+// may run once another's MI is in use. Safe on any thread.
 
 namespace zorva::broker {
 
@@ -40,6 +42,7 @@ class ProviderLoader {
     std::string prefix;
     std::string library;
     std::string nameSpace;
+    unsigned kinds = 0;
     std::atomic<const CMPIInstanceMI*> instance = nullptr;
     std::atomic<const CMPIAssociationMI*> association = nullptr;
     std::atomic<const CMPIMethodMI*> method = nullptr;
@@ -47,6 +50,9 @@ class ProviderLoader {
 
   Provider& providerOf(const ProviderEntry& entry) const;
   Library* open(const std::string& name, Status& status);
+  void makeAll(Provider& provider);
+  template <class Mi>
+  const Mi* find(const ProviderEntry& entry, std::atomic<const Mi*> Provider::*slot, const char* kind, Status& status);
   template <class Mi>
   const Mi* make(Provider& provider, std::atomic<const Mi*> Provider::*slot, const char* kind, Status& status);
   template <class Mi>

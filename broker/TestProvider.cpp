@@ -1,3 +1,4 @@
+#include <atomic>
 #include <stdexcept>
 #include <string>
 
@@ -10,7 +11,9 @@
 
 namespace {
 
-const CMPIBroker* broker = nullptr;
+// Several providers share it, and each may be made while another runs.
+std::atomic<const CMPIBroker*> retained = nullptr;
+const CMPIBroker* broker() { return retained.load(); }
 
 constexpr CMPIStatus kOk{CMPI_RC_OK, nullptr};
 
@@ -49,11 +52,13 @@ std::string flags(const CMPIContext* context) {
   return std::to_string(entry.value.uint32);
 }
 
-void note(const std::string& line) { broker->eft->logMessage(broker, CMPI_SEV_INFO, nullptr, line.c_str(), nullptr); }
+void note(const std::string& line) {
+  broker()->eft->logMessage(broker(), CMPI_SEV_INFO, nullptr, line.c_str(), nullptr);
+}
 
 CMPIObjectPath* pathOf(const CMPIObjectPath* like, const char* className, const std::string& name) {
   CMPIObjectPath* path =
-      broker->eft->newObjectPath(broker, text(like->ft->getNameSpace(like, nullptr)).c_str(), className, nullptr);
+      broker()->eft->newObjectPath(broker(), text(like->ft->getNameSpace(like, nullptr)).c_str(), className, nullptr);
   path->ft->addKey(path, "name", reinterpret_cast<const CMPIValue*>(name.c_str()), CMPI_chars);
   return path;
 }
@@ -61,8 +66,8 @@ CMPIObjectPath* pathOf(const CMPIObjectPath* like, const char* className, const 
 CMPIInstance* instanceOf(const CMPIObjectPath* like, const char* className, const std::string& name,
                          const char** properties) {
   CMPIObjectPath* path =
-      broker->eft->newObjectPath(broker, text(like->ft->getNameSpace(like, nullptr)).c_str(), className, nullptr);
-  CMPIInstance* instance = broker->eft->newInstance(broker, path, nullptr);
+      broker()->eft->newObjectPath(broker(), text(like->ft->getNameSpace(like, nullptr)).c_str(), className, nullptr);
+  CMPIInstance* instance = broker()->eft->newInstance(broker(), path, nullptr);
   const char* keys[] = {"Name", nullptr};
   instance->ft->setPropertyFilter(instance, properties, keys);
   instance->ft->setProperty(instance, "NAME", reinterpret_cast<const CMPIValue*>(name.c_str()), CMPI_chars);
@@ -70,7 +75,7 @@ CMPIInstance* instanceOf(const CMPIObjectPath* like, const char* className, cons
   instance->ft->setProperty(instance, "Extra", reinterpret_cast<const CMPIValue*>("more"), CMPI_chars);
   const CMPIUint16 size = 7;
   instance->ft->setProperty(instance, "Size", reinterpret_cast<const CMPIValue*>(&size), CMPI_uint16);
-  CMPIArray* labels = broker->eft->newArray(broker, 2, CMPI_chars, nullptr);
+  CMPIArray* labels = broker()->eft->newArray(broker(), 2, CMPI_chars, nullptr);
   labels->ft->setElementAt(labels, 0, reinterpret_cast<const CMPIValue*>("x"), CMPI_chars);
   labels->ft->setElementAt(labels, 1, reinterpret_cast<const CMPIValue*>("y"), CMPI_chars);
   CMPIValue value;
@@ -145,7 +150,7 @@ CMPIStatus modify(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const 
 CMPIStatus remove(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath* path) {
   note("DeleteInstance " + shown(path));
   if (nameOf(path) == "a") return kOk;
-  return {CMPI_RC_ERR_NOT_FOUND, broker->eft->newString(broker, "no such thing", nullptr)};
+  return {CMPI_RC_ERR_NOT_FOUND, broker()->eft->newString(broker(), "no such thing", nullptr)};
 }
 
 CMPIInstanceMIFT thingTable = {CMPICurrentVersion,
@@ -204,10 +209,10 @@ CMPIStatus trouble(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result
   if (name == "throw") throw std::out_of_range("thrown on purpose");
   if (name == "throw a number") throw 42;
   if (name == "fail") return {CMPI_RC_ERR_ACCESS_DENIED, nullptr};
-  if (name == "fail with text") return {CMPI_RC_ERR_FAILED, broker->eft->newString(broker, "the reason", nullptr)};
+  if (name == "fail with text") return {CMPI_RC_ERR_FAILED, broker()->eft->newString(broker(), "the reason", nullptr)};
   if (name == "error") {
-    CMPIError* error = broker->eft->newCMPIError(broker, "test", "T1", "told by an error", ErrorSevHigh,
-                                                 ErrorProbCauseUnknown, CMPI_RC_ERR_ALREADY_EXISTS, nullptr);
+    CMPIError* error = broker()->eft->newCMPIError(broker(), "test", "T1", "told by an error", ErrorSevHigh,
+                                                   ErrorProbCauseUnknown, CMPI_RC_ERR_ALREADY_EXISTS, nullptr);
     result->ft->returnError(result, error);
     return kOk;
   }
@@ -240,9 +245,9 @@ CMPIInstanceMIFT troubleTable = {CMPICurrentVersion,
 
 CMPIStatus callingNames(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                         const CMPIObjectPath* path) {
-  CMPIObjectPath* things = broker->eft->newObjectPath(broker, "ROOT/cimv2", "t_thing", nullptr);
+  CMPIObjectPath* things = broker()->eft->newObjectPath(broker(), "ROOT/cimv2", "t_thing", nullptr);
   CMPIStatus status = kOk;
-  CMPIEnumeration* names = broker->bft->enumerateInstanceNames(broker, context, things, &status);
+  CMPIEnumeration* names = broker()->bft->enumerateInstanceNames(broker(), context, things, &status);
   while (status.rc == CMPI_RC_OK && names->ft->hasNext(names, &status) != 0) {
     const CMPIData next = names->ft->getNext(names, &status);
     result->ft->returnObjectPath(result, pathOf(path, "T_Calling", "of " + nameOf(next.value.ref)));
@@ -252,10 +257,10 @@ CMPIStatus callingNames(CMPIInstanceMI*, const CMPIContext* context, const CMPIR
 
 CMPIStatus callings(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result, const CMPIObjectPath* path,
                     const char** properties) {
-  CMPIObjectPath* things = broker->eft->newObjectPath(broker, "root/cimv2", "T_Thing", nullptr);
+  CMPIObjectPath* things = broker()->eft->newObjectPath(broker(), "root/cimv2", "T_Thing", nullptr);
   const char* wanted[] = {"size", nullptr};
   CMPIStatus status = kOk;
-  CMPIEnumeration* found = broker->bft->enumerateInstances(broker, context, things, wanted, &status);
+  CMPIEnumeration* found = broker()->bft->enumerateInstances(broker(), context, things, wanted, &status);
   while (status.rc == CMPI_RC_OK && found->ft->hasNext(found, &status) != 0) {
     const CMPIData next = found->ft->getNext(found, &status);
     const CMPIInstance* instance = next.value.inst;
@@ -275,12 +280,12 @@ CMPIStatus calling(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult
   const std::string name = nameOf(path);
   CMPIStatus status = kOk;
   if (name == "circle") {
-    broker->bft->getInstance(broker, context, path, nullptr, &status);
+    broker()->bft->getInstance(broker(), context, path, nullptr, &status);
     return status;
   }
   const char* className = name == "absent" ? "T_Absent" : name == "unserved" ? "T_Unserved" : "T_Thing";
-  CMPIObjectPath* asked = broker->eft->newObjectPath(broker, "root/cimv2", className, nullptr);
-  broker->bft->enumerateInstanceNames(broker, context, asked, &status);
+  CMPIObjectPath* asked = broker()->eft->newObjectPath(broker(), "root/cimv2", className, nullptr);
+  broker()->bft->enumerateInstanceNames(broker(), context, asked, &status);
   if (status.rc == CMPI_RC_OK) result->ft->returnInstance(result, instanceOf(path, "T_Calling", name, nullptr));
   return status;
 }
@@ -352,8 +357,8 @@ CMPIStatus associatorNames(CMPIAssociationMI*, const CMPIContext*, const CMPIRes
 }
 
 CMPIInstance* linkOf(const CMPIObjectPath* path) {
-  CMPIObjectPath* name = broker->eft->newObjectPath(broker, "", "T_ThingOther", nullptr);
-  CMPIInstance* link = broker->eft->newInstance(broker, name, nullptr);
+  CMPIObjectPath* name = broker()->eft->newObjectPath(broker(), "", "T_ThingOther", nullptr);
+  CMPIInstance* link = broker()->eft->newInstance(broker(), name, nullptr);
   CMPIObjectPath* left = pathOf(path, "T_Thing", "a");
   CMPIObjectPath* right = pathOf(path, "T_Other", "o");
   link->ft->setProperty(link, "Left", reinterpret_cast<const CMPIValue*>(&left), CMPI_ref);
@@ -401,7 +406,7 @@ CMPIAssociationMIFT refusingTable = {CMPICurrentVersion,
 #define TEST_INSTANCE_MI(prefix, functions)                                                                         \
   CMPI_EXTERN_C CMPIInstanceMI* prefix##_Create_InstanceMI(const CMPIBroker* mb, const CMPIContext*, CMPIStatus*) { \
     static CMPIInstanceMI mi = {nullptr, &functions};                                                               \
-    broker = mb;                                                                                                    \
+    retained = mb;                                                                                                  \
     return &mi;                                                                                                     \
   }
 
@@ -409,7 +414,7 @@ CMPIAssociationMIFT refusingTable = {CMPICurrentVersion,
   CMPI_EXTERN_C CMPIAssociationMI* prefix##_Create_AssociationMI(const CMPIBroker* mb, const CMPIContext*, \
                                                                  CMPIStatus*) {                            \
     static CMPIAssociationMI mi = {nullptr, &functions};                                                   \
-    broker = mb;                                                                                           \
+    retained = mb;                                                                                         \
     return &mi;                                                                                            \
   }
 
@@ -423,15 +428,15 @@ TEST_ASSOCIATION_MI(Refusing, refusingTable)
 
 CMPI_EXTERN_C CMPIMethodMI* Thing_Create_MethodMI(const CMPIBroker* mb, const CMPIContext* context, CMPIStatus*) {
   static CMPIMethodMI mi = {nullptr, &methodTable};
-  broker = mb;
+  retained = mb;
   const CMPIData nameSpace = context->ft->getEntry(context, CMPIInitNameSpace, nullptr);
   note("made in " + text(nameSpace.value.string));
   return &mi;
 }
 
 CMPI_EXTERN_C CMPIInstanceMI* Null_Create_InstanceMI(const CMPIBroker* mb, const CMPIContext*, CMPIStatus* status) {
-  broker = mb;
-  *status = {CMPI_RC_ERR_FAILED, broker->eft->newString(broker, "not today", nullptr)};
+  retained = mb;
+  *status = {CMPI_RC_ERR_FAILED, broker()->eft->newString(broker(), "not today", nullptr)};
   return nullptr;
 }
 

@@ -1,5 +1,6 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <atomic>
 #include <cerrno>
@@ -85,12 +86,12 @@ TEST_F(ThreadsTest, AThreadEndsEarly) {
 }
 
 TEST_F(ThreadsTest, AThreadIsCancelled) {
+  // Its frames hold no variables: AddressSanitizer does not learn that a cancelled thread left them.
   void* thread = xft_.newThread(
-      [](void* parameter) -> void* {
-        static_cast<const CMPIBrokerExtFT*>(parameter)->threadSleep(60000);
-        return nullptr;
+      [](void*) -> void* {
+        for (;;) pause();
       },
-      const_cast<CMPIBrokerExtFT*>(&xft_), 0);
+      nullptr, 0);
   EXPECT_EQ(xft_.cancelThread(thread), 0);
   void* result = nullptr;
   EXPECT_EQ(xft_.joinThread(thread, &result), 0);

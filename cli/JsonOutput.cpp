@@ -22,9 +22,9 @@ Json ofScalar(const broker::Scalar& scalar) {
   if (const auto* value = std::get_if<char16_t>(&scalar)) return static_cast<unsigned>(*value);
   if (std::holds_alternative<std::monostate>(scalar)) return nullptr;
   if (const auto* value = std::get_if<broker::Boxed<broker::ObjectPath>>(&scalar)) {
-    return jsonSafe(broker::pathText(**value));
+    return asUtf8(broker::pathText(**value));
   }
-  return jsonSafe(scalarText(scalar));
+  return asUtf8(scalarText(scalar));
 }
 
 Json ofValue(const broker::Value& value) {
@@ -37,7 +37,7 @@ Json ofValue(const broker::Value& value) {
 
 Json ofTexts(const std::vector<std::string>& texts) {
   Json list = Json::array();
-  for (const std::string& text : texts) list.push_back(jsonSafe(text));
+  for (const std::string& text : texts) list.push_back(asUtf8(text));
   return list;
 }
 
@@ -49,7 +49,7 @@ Json ofClassRows(const std::vector<ClassRow>& rows) {
     entry["provider"] = row.provider;
     entry["library"] = row.library;
     entry["instances"] = row.count ? Json(*row.count) : Json(nullptr);
-    if (!row.problem.empty()) entry["problem"] = jsonSafe(row.problem);
+    if (!row.problem.empty()) entry["problem"] = asUtf8(row.problem);
     list.push_back(std::move(entry));
   }
   return list;
@@ -57,20 +57,20 @@ Json ofClassRows(const std::vector<ClassRow>& rows) {
 
 Json ofEndpoint(const EndpointRow& row) {
   Json entry;
-  entry["name"] = jsonSafe(row.name);
-  entry["system"] = jsonSafe(row.system);
+  entry["name"] = asUtf8(row.name);
+  entry["system"] = asUtf8(row.system);
   entry["state"] = row.stateNumber ? Json(*row.stateNumber) : Json(nullptr);
-  entry["host_name"] = jsonSafe(row.hostName);
-  entry["domain_name"] = jsonSafe(row.domainName);
+  entry["host_name"] = asUtf8(row.hostName);
+  entry["domain_name"] = asUtf8(row.domainName);
   entry["suffixes"] = ofTexts(row.suffixes);
   return entry;
 }
 
 Json ofSetting(const SettingRow& row) {
   Json entry;
-  entry["interface"] = jsonSafe(row.interface);
+  entry["interface"] = asUtf8(row.interface);
   entry["setting"] = row.setting;
-  entry["value"] = row.isList ? ofTexts(row.values) : Json(jsonSafe(row.values.empty() ? "" : row.values.front()));
+  entry["value"] = row.isList ? ofTexts(row.values) : Json(asUtf8(row.values.empty() ? "" : row.values.front()));
   entry["from"] = row.source == SettingSource::None ? Json(nullptr) : Json(sourceName(row.source));
   return entry;
 }
@@ -87,7 +87,7 @@ Json ofRows(const std::vector<Row>& rows, Convert convert) {
 std::string instanceJson(const broker::Instance& instance, std::size_t depth) {
   Json json;
   json["class"] = instance.path.className;
-  json["path"] = jsonSafe(broker::pathText(instance.path));
+  json["path"] = asUtf8(broker::pathText(instance.path));
   json["properties"] = Json::object();
   for (const broker::Property& property : instance.properties) {
     json["properties"][property.name] = ofValue(property.value);
@@ -101,14 +101,22 @@ std::string instanceJson(const broker::Instance& instance, std::size_t depth) {
   return shifted;
 }
 
-std::string pathJson(const broker::ObjectPath& path) { return dumped(jsonSafe(broker::pathText(path))); }
+std::string pathJson(const broker::ObjectPath& path) { return dumped(asUtf8(broker::pathText(path))); }
+
+std::string methodResultJson(const broker::MethodResult& result) {
+  Json json;
+  json["return_value"] = ofValue(result.returnValue);
+  json["output"] = Json::object();
+  for (const broker::NamedValue& output : result.output) json["output"][output.name] = ofValue(output.value);
+  return dumped(json);
+}
 
 std::string hostViewJson(const HostView& view) {
   Json json;
-  json["system"] = jsonSafe(view.systemName);
+  json["system"] = asUtf8(view.systemName);
   json["endpoints"] = ofRows(view.endpoints, ofEndpoint);
   json["servers"] = ofRows(view.servers, [](const ServerRow& row) {
-    return Json{{"order", row.order}, {"address", jsonSafe(row.address)}};
+    return Json{{"order", row.order}, {"address", asUtf8(row.address)}};
   });
   json["interface_settings"] = ofRows(view.interfaceSettings, ofSetting);
   json["host_settings"] = ofRows(view.hostSettings, ofSetting);

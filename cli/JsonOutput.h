@@ -3,11 +3,11 @@
 #include <cstddef>
 #include <string>
 
-#include "broker/Value.h"
+#include "broker/Broker.h"
 #include "cli/HostView.h"
 
 // JSON documents (RFC 8259) of what the commands show. Each text is indented by two blanks and has no line feed at its
-// end. Bytes that are no UTF-8 come out as jsonSafe() has them.
+// end. Bytes that are no UTF-8 come out as asUtf8() has them.
 
 namespace zorva::cli {
 
@@ -18,6 +18,9 @@ std::string instanceJson(const broker::Instance& instance, std::size_t depth);
 
 /// A path's text as a JSON string.
 std::string pathJson(const broker::ObjectPath& path);
+
+/// What a method gave back: "return_value" and "output".
+std::string methodResultJson(const broker::MethodResult& result);
 
 /// What `show` shows.
 std::string hostViewJson(const HostView& view);

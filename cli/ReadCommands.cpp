@@ -8,21 +8,11 @@
 
 namespace zorva::cli {
 
-namespace {
-
-broker::Selection selectionOf(const Arguments& arguments) {
-  broker::Selection selection;
-  if (!arguments.properties.empty()) selection.propertyList = arguments.properties;
-  return selection;
-}
-
-}  // namespace
-
 void enumerateNames(const Arguments& arguments) {
   Session session(arguments);
   const broker::ObjectPath wanted = readClassName(arguments.target);
   const schema::Class& declared = session.classNamed(wanted.className);
-  const auto writer = makeResultWriter(arguments.output, session.layout(), Count::Many);
+  const auto writer = makeResultWriter(arguments.output, session.layout(), Count::Many, Results::Names);
   const broker::Status status =
       session.broker().enumerateInstanceNames(wanted.nameSpace, declared.name(), [&](const broker::ObjectPath& path) {
         writer->add(path);
@@ -36,7 +26,7 @@ void enumerateInstances(const Arguments& arguments) {
   Session session(arguments);
   const broker::ObjectPath wanted = readClassName(arguments.target);
   const schema::Class& declared = session.classNamed(wanted.className);
-  const auto writer = makeResultWriter(arguments.output, session.layout(), Count::Many);
+  const auto writer = makeResultWriter(arguments.output, session.layout(), Count::Many, Results::Instances);
   const broker::Status status = session.broker().enumerateInstances(
       wanted.nameSpace, declared.name(), selectionOf(arguments), [&](const broker::Instance& instance) {
         writer->add(instance);
@@ -48,7 +38,7 @@ void enumerateInstances(const Arguments& arguments) {
 
 void getInstance(const Arguments& arguments) {
   Session session(arguments);
-  const auto writer = makeResultWriter(arguments.output, session.layout(), Count::One);
+  const auto writer = makeResultWriter(arguments.output, session.layout(), Count::One, Results::Instances);
   const broker::ObjectPath path = resolvePath(session, arguments.target);
   broker::Instance instance;
   const broker::Status status = session.broker().getInstance(path, selectionOf(arguments), instance);

@@ -3,8 +3,10 @@
 #include <algorithm>
 #include <string>
 
+#include "cimxml/ElementWriter.h"
 #include "cli/Failure.h"
 #include "cli/JsonOutput.h"
+#include "cli/MofOutput.h"
 #include "cli/Session.h"
 #include "cli/Text.h"
 #include "cli/ValueText.h"
@@ -60,9 +62,54 @@ class JsonWriter : public ResultWriter {
   bool any_ = false;
 };
 
+class MofWriter : public ResultWriter {
+ public:
+  void add(const broker::Instance& instance) override {
+    if (any_) write("\n");
+    any_ = true;
+    write(instanceMof(instance));
+  }
+
+ private:
+  bool any_ = false;
+};
+
+/// A declaration document: instances with their paths, which any CIM-XML reader can take.
+class XmlWriter : public ResultWriter {
+ public:
+  void add(const broker::Instance& instance) override {
+    begin();
+    std::string element = "<VALUE.OBJECTWITH";
+    const bool isLocal = instance.path.host.empty();
+    element += isLocal ? "LOCALPATH>" : "PATH>";
+    cimxml::appendInstancePath(element, instance.path);
+    cimxml::appendInstance(element, instance);
+    write(element + (isLocal ? "</VALUE.OBJECTWITHLOCALPATH>\n" : "</VALUE.OBJECTWITHPATH>\n"));
+  }
+
+  void finish() override {
+    begin();
+    write("</DECLGROUP.WITHPATH></DECLARATION></CIM>\n");
+  }
+
+ private:
+  void begin() {
+    if (begun_) return;
+    begun_ = true;
+    write("<?xml version=\"1.0\" encoding=\"utf-8\"?>\n"
+          "<CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.4\"><DECLARATION><DECLGROUP.WITHPATH>\n");
+  }
+
+  bool begun_ = false;
+};
+
 }  // namespace
 
-std::unique_ptr<ResultWriter> makeResultWriter(OutputFormat format, const Layout& layout, Count count) {
+std::unique_ptr<ResultWriter> makeResultWriter(OutputFormat format, const Layout& layout, Count count, Results results) {
+  if (results == Results::Names && (format == OutputFormat::Mof || format == OutputFormat::Xml)) {
+    throw Failure(ExitCode::WrongUsage, std::string("names of instances cannot be written as ") + formatName(format),
+                  "use --output json, or ask for the instances themselves");
+  }
   switch (format) {
     case OutputFormat::Table:
       return std::make_unique<TableWriter>(layout);

@@ -115,12 +115,20 @@ void Session::log(broker::LogLevel level, std::string_view text) const {
        printable(text));
 }
 
+broker::Selection selectionOf(const Arguments& arguments) {
+  broker::Selection selection;
+  if (!arguments.properties.empty()) selection.propertyList = arguments.properties;
+  return selection;
+}
+
 void tellError(std::string_view what, std::string_view hint) {
   tell("", what);
   if (!hint.empty()) tell("", hint);
 }
 
 void tellWarning(std::string_view what) { tell("warning: ", what); }
+
+void tellNote(std::string_view what) { tell("note: ", what); }
 
 void write(std::string_view text) {
   if (std::fwrite(text.data(), 1, text.size(), stdout) != text.size()) flushOutput();

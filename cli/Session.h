@@ -63,11 +63,17 @@ class Session {
   std::unique_ptr<broker::Broker> broker_;
 };
 
+/// What of each instance the arguments want.
+broker::Selection selectionOf(const Arguments& arguments);
+
 /// The lines of an error on stderr: what, and what to do next.
 void tellError(std::string_view what, std::string_view hint = {});
 
 /// A line that tells what a person should know although the command was done.
 void tellWarning(std::string_view what);
+
+/// A line of the same kind that is no warning.
+void tellNote(std::string_view what);
 
 /// Writes to standard output. Throws Failure where that cannot be written.
 void write(std::string_view text);

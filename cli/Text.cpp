@@ -40,8 +40,9 @@ void appendEscape(std::string& out, std::uint32_t code) {
 
 /// The C library's table of widths, which only a UTF-8 locale has.
 std::size_t characterWidth(std::uint32_t code) {
+  if (code < 0x80) return 1;
   static const locale_t utf8 = ::newlocale(LC_CTYPE_MASK, "C.UTF-8", nullptr);
-  if (code < 0x80 || utf8 == nullptr) return 1;
+  if (utf8 == nullptr) return 1;
   const locale_t before = ::uselocale(utf8);
   const int width = ::wcwidth(static_cast<wchar_t>(code));
   ::uselocale(before);
@@ -123,7 +124,7 @@ std::string padded(std::string_view text, std::size_t width) {
   return out;
 }
 
-std::string jsonSafe(std::string_view text) {
+std::string asUtf8(std::string_view text) {
   std::string out;
   out.reserve(text.size());
   while (!text.empty()) {

@@ -25,9 +25,9 @@ std::vector<std::string> wrapped(std::string_view text, std::size_t width);
 /// `text` with blanks behind it up to `width` columns.
 std::string padded(std::string_view text, std::size_t width);
 
-/// `text` for a JSON document, which is UTF-8: a byte that is none stands as the character U+10EE00 plus the byte, as
-/// in the agent's own documents.
-std::string jsonSafe(std::string_view text);
+/// `text` for a document that must be UTF-8: a byte that is none stands as the character U+10EE00 plus the byte, as in the
+/// agent's own documents.
+std::string asUtf8(std::string_view text);
 
 /// The texts with `separator` between them.
 std::string joined(const std::vector<std::string>& texts, std::string_view separator);

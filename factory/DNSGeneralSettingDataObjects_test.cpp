@@ -20,8 +20,8 @@ using ::testing::SizeIs;
 constexpr const char* kClass = "ZORVA_DNSGeneralSettingData";
 constexpr const char* kLogger = "Zorvagent.DNSObjFactory";
 
-const std::vector<std::string> kAllProperties = {"InstanceID",        "Caption",       "Description",        "ElementName",
-                                                 "ConfigurationName", "AddressOrigin", "DNSSuffixesToAppend"};
+const std::vector<std::string> kAllProperties = {
+    "InstanceID", "Caption", "Description", "ElementName", "ConfigurationName", "AddressOrigin", "DNSSuffixesToAppend"};
 
 using Instances = std::vector<CMPIInstance*>;
 using Paths = std::vector<CMPIObjectPath*>;
@@ -239,8 +239,8 @@ TEST_F(DNSGeneralSettingDataObjectsTest, WithoutAnInterfaceOfTheHostThereIsNeith
 }
 
 TEST_F(DNSGeneralSettingDataObjectsTest, TheKeyIsReadAndComparedWithNothing) {
-  for (const Path& path : {Path(kClass).key("InstanceID", "dnsgen1:elsewhere"), Path(kClass).key("InstanceID", ""),
-                           Path(kClass)}) {
+  for (const Path& path :
+       {Path(kClass).key("InstanceID", "dnsgen1:elsewhere"), Path(kClass).key("InstanceID", ""), Path(kClass)}) {
     Instances instances;
     broker_.startOver();
     const CMPIObjectPath* ref = broker_.make(path, "ref");

@@ -400,6 +400,18 @@ class AssociationTest : public ::testing::Test {
     }
   }
 
+  // The broker writes the context of an up-call where it is another than the operation's.
+  void expectUpCallsInTheOperationsContext(const std::vector<Request>& requests, std::size_t count) {
+    for (const Request& request : requests) {
+      const Outcome outcome = request.run();
+      for (const std::string& line : outcome.calls.only({"enumerateInstances", "enumerateInstanceNames"})) {
+        EXPECT_THAT(line, ::testing::Not(::testing::HasSubstr("context"))) << request.name;
+        --count;
+      }
+    }
+    EXPECT_EQ(0U, count) << "up-calls fewer than awaited, or more";
+  }
+
   // What holds of a request whatever failed beneath it.
   void expectRegularEnd(const std::string& name, const Outcome& outcome) {
     const std::string closing = closingOf(outcome);

@@ -3,7 +3,6 @@
 namespace ZV::Test {
 namespace {
 
-using ::testing::Each;
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 using ::testing::SizeIs;

@@ -31,6 +31,9 @@ FetchHook::~FetchHook() { activeHook = nullptr; }
 ZV_WRAPPED(getAllDNSGeneralSettingDataCMPIObjectPaths,
            "_ZN2ZV42getAllDNSGeneralSettingDataCMPIObjectPathsEPK11_CMPIBrokerPK15_CMPIObjectPathPSt6vectorIPS3_"
            "SaIS7_EEP11_CMPIStatus")
+ZV_WRAPPED(getAllDNSSettingDataCMPIObjectPaths,
+           "_ZN2ZV35getAllDNSSettingDataCMPIObjectPathsEPK11_CMPIBrokerPK15_CMPIObjectPathPSt6vectorIPS3_SaIS7_EEP11_"
+           "CMPIStatus")
 ZV_WRAPPED(getAllDNSGeneralSettingDataCMPIInstances,
            "_ZN2ZV40getAllDNSGeneralSettingDataCMPIInstancesEPK11_CMPIBrokerPK15_CMPIObjectPathPPKcPSt6vectorIP13_"
            "CMPIInstanceSaISB_EEP11_CMPIStatus")
@@ -42,6 +45,12 @@ unsigned short wrapped_getAllDNSGeneralSettingDataCMPIObjectPaths(const CMPIBrok
                                                                   Paths* paths, CMPIStatus* status) {
   const unsigned short fetched = real_getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, paths, status);
   return hooked(fetched, *paths, &FetchHook::generalSettingPaths);
+}
+
+unsigned short wrapped_getAllDNSSettingDataCMPIObjectPaths(const CMPIBroker* broker, const CMPIObjectPath* ref,
+                                                           Paths* paths, CMPIStatus* status) {
+  const unsigned short fetched = real_getAllDNSSettingDataCMPIObjectPaths(broker, ref, paths, status);
+  return hooked(fetched, *paths, &FetchHook::settingPaths);
 }
 
 unsigned short wrapped_getAllDNSGeneralSettingDataCMPIInstances(const CMPIBroker* broker, const CMPIObjectPath* ref,

@@ -127,6 +127,7 @@ class FetchHook {
   FetchHook& operator=(const FetchHook&) = delete;
 
   std::function<unsigned short(std::vector<CMPIObjectPath*>&)> generalSettingPaths;
+  std::function<unsigned short(std::vector<CMPIObjectPath*>&)> settingPaths;
   std::function<unsigned short(std::vector<CMPIInstance*>&)> generalSettings;
   std::function<unsigned short(std::vector<CMPIInstance*>&)> settings;
 };

@@ -9,7 +9,9 @@
 #include <cerrno>
 #include <cstdint>
 #include <cstring>
-#include <string_view>
+#include <ctime>
+#include <tuple>
+#include <utility>
 
 namespace zorvagent {
 namespace {
@@ -48,17 +50,70 @@ std::string currentDirectory() {
 }  // namespace
 
 void FileWatch::watch(const std::vector<std::string>& paths) {
-  places_.clear();
-  blind_ = false;
-  inotify_ = FileDescriptor(::inotify_init1(IN_NONBLOCK | IN_CLOEXEC));
-  if (!inotify_) blind_ = true;
-  for (const std::string& path : paths) {
-    if (!blind_) watchWay(path);
-  }
+  watching_ = true;
+  states_.clear();
+  if (comparisonsLeft_ <= 0) return startInotify(paths);
+  for (const std::string& path : paths) states_.push_back(stateOf(path));
 }
 
 bool FileWatch::changed() {
-  if (blind_) return true;
+  if (!watching_) return true;
+  if (comparisonsLeft_ <= 0) return blind_ || readReports();
+  // The last comparison says yes whatever it sees, so that the caller reads again once inotify is there.
+  if (--comparisonsLeft_ == 0) return true;
+  return std::any_of(states_.begin(), states_.end(), [this](const State& state) { return differs(state); });
+}
+
+// A change bears the kernel's coarse time, which stands still for some milliseconds. What was changed in the very tick
+// in which it is looked at could be changed again in that tick without a trace.
+FileWatch::State FileWatch::stateOf(const std::string& path) {
+  State state;
+  state.path = path;
+  timespec now{};
+  ::clock_gettime(CLOCK_REALTIME_COARSE, &now);
+  if (::stat(path.c_str(), &state.status) != 0) {
+    state.error = errno;
+    state.status = {};
+    return state;
+  }
+  const timespec& changed = state.status.st_ctim;
+  state.mayHideChanges = std::tie(changed.tv_sec, changed.tv_nsec) >= std::tie(now.tv_sec, now.tv_nsec);
+  return state;
+}
+
+bool FileWatch::differs(const State& before) const {
+  if (before.mayHideChanges) return true;
+  const State now = stateOf(before.path);
+  const auto identity = [](const State& state) {
+    const struct stat& status = state.status;
+    return std::tuple(state.error, status.st_dev, status.st_ino, status.st_size, status.st_ctim.tv_sec,
+                      status.st_ctim.tv_nsec);
+  };
+  return identity(now) != identity(before);
+}
+
+void FileWatch::startInotify(const std::vector<std::string>& paths) {
+  const std::vector<Place> old = std::exchange(places_, {});
+  blind_ = false;
+  if (!inotify_) inotify_ = FileDescriptor(::inotify_init1(IN_NONBLOCK | IN_CLOEXEC));
+  if (!inotify_) {
+    blind_ = true;
+    return;
+  }
+  readReports();
+  for (const std::string& path : paths) watchWay(path);
+  removeAllBut(places_, old);
+}
+
+// Watches on ways that no file leads along any more.
+void FileWatch::removeAllBut(const std::vector<Place>& kept, const std::vector<Place>& old) {
+  for (const Place& place : old) {
+    const auto isSame = [&place](const Place& other) { return other.descriptor == place.descriptor; };
+    if (std::none_of(kept.begin(), kept.end(), isSame)) ::inotify_rm_watch(inotify_.get(), place.descriptor);
+  }
+}
+
+bool FileWatch::readReports() {
   alignas(inotify_event) std::array<char, 8192> buffer;
   bool changed = false;
   for (int reads = 0; reads < kMostReads; ++reads) {
@@ -70,8 +125,8 @@ bool FileWatch::changed() {
       inotify_event event;
       std::memcpy(&event, buffer.data() + place, sizeof event);
       const char* name = event.len == 0 ? "" : buffer.data() + place + sizeof event;
-      // IN_Q_OVERFLOW: reports were lost. IN_IGNORED: what was watched is gone.
-      if ((event.mask & (IN_Q_OVERFLOW | IN_IGNORED | IN_UNMOUNT)) != 0 || concerns(event.wd, name)) changed = true;
+      // IN_Q_OVERFLOW: reports were lost.
+      if ((event.mask & IN_Q_OVERFLOW) != 0 || concerns(event.wd, name)) changed = true;
       place += sizeof event + event.len;
     }
   }
@@ -116,10 +171,10 @@ bool FileWatch::add(const std::string& path, unsigned int mask, const std::strin
   return true;
 }
 
+// A report without a name is of the watched thing itself, be it that it is gone.
 bool FileWatch::concerns(int descriptor, const char* name) const {
-  // A report without a name is of the watched thing itself.
-  return *name == '\0' || std::any_of(places_.begin(), places_.end(), [&](const Place& place) {
-    return place.descriptor == descriptor && place.name == name;
+  return std::any_of(places_.begin(), places_.end(), [&](const Place& place) {
+    return place.descriptor == descriptor && (*name == '\0' || place.name == name);
   });
 }
 

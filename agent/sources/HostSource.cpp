@@ -77,7 +77,8 @@ HostSource::HostSource(HostSourceOptions options)
     : options_(std::move(options)),
       resolvConf_(options_.root + "/etc/resolv.conf"),
       stubResolvConf_(options_.root + "/run/systemd/resolve/resolv.conf"),
-      hosts_(options_.root + "/etc/hosts") {}
+      hosts_(options_.root + "/etc/hosts"),
+      watch_(options_.comparisons) {}
 
 bool HostSource::changed() {
   if (!watching_) return true;
@@ -88,6 +89,7 @@ bool HostSource::changed() {
 
 void HostSource::reopen() {
   watching_ = false;
+  watch_ = FileWatch(options_.comparisons);
   reader_.close();
 }
 

@@ -12,7 +12,8 @@ namespace zorvagent {
 
 struct HostSourceOptions {
   bool includeLoopback = false;
-  std::string root;  // put before the path of each file that is read; for tests
+  std::string root;                           // put before the path of each file that is read; for tests
+  int comparisons = FileWatch::kComparisons;  // of files, before they are watched
 };
 
 // Interfaces with state and addresses from the kernel; names from the kernel, /etc/hosts and resolv.conf; DNS servers

@@ -34,6 +34,7 @@ class HostFiles : public ::testing::Test {
  protected:
   HostFiles() {
     options_.root = directory_.path() + '.';
+    options_.comparisons = 0;         // each change is noticed once
     options_.includeLoopback = true;  // so that there is an interface wherever the test runs
   }
 

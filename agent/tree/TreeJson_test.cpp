@@ -1,6 +1,10 @@
 #include "agent/tree/TreeJson.h"
 
 #include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <thread>
 
 #include "agent/Agent.h"
 #include "agent/sources/FileSource.h"
@@ -223,6 +227,7 @@ TEST(FileSource, ReadsTheTreeAgainWhenTheFileChanges) {
   const TemporaryDirectory directory;
   FileSource source(directory.write("tree.json", R"({"system_name": "first"})"));
   EXPECT_TRUE(source.changed());
+  std::this_thread::sleep_for(std::chrono::milliseconds(20));  // past the tick in which the file was made
   EXPECT_EQ(source.read()->systemName(), "first");
   EXPECT_FALSE(source.changed());
   directory.write("tree.json", R"({"system_name": "second"})");

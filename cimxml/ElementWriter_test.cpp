@@ -1,0 +1,156 @@
+#include "cimxml/ElementWriter.h"
+
+#include <gtest/gtest.h>
+
+#include <string>
+
+namespace zorva::cimxml {
+namespace {
+
+using broker::Instance;
+using broker::ObjectPath;
+using broker::Property;
+using broker::Scalar;
+using broker::Value;
+
+std::string escaped(std::string_view text) {
+  std::string out;
+  appendEscaped(out, text);
+  return out;
+}
+
+std::string elementOf(const Value& value) {
+  std::string out;
+  appendValue(out, value);
+  return out;
+}
+
+std::string pathElement(const ObjectPath& path) {
+  std::string out;
+  appendInstancePath(out, path);
+  return out;
+}
+
+std::string instanceElement(const Property& property, bool classOrigin = false) {
+  Instance instance;
+  instance.path.className = "C";
+  instance.properties.push_back(property);
+  std::string out;
+  appendInstance(out, instance, classOrigin);
+  return out;
+}
+
+TEST(XmlText, HasNothingThatAnXmlReaderWouldTakeForMarkup) {
+  EXPECT_EQ(escaped(R"(<a href="x">&)"), "&lt;a href=&quot;x&quot;&gt;&amp;");
+}
+
+TEST(XmlText, KeepsLineEndsAndTabsThroughAReader) { EXPECT_EQ(escaped("a\r\n\tb"), "a&#13;&#10;&#9;b"); }
+
+TEST(XmlText, ReplacesWhatXmlCannotHold) {
+  EXPECT_EQ(escaped(std::string("a\x01", 2)), "a\xEF\xBF\xBD");
+  EXPECT_EQ(escaped(std::string("\0b", 2)),
+            "\xEF\xBF\xBD"
+            "b");
+  EXPECT_EQ(escaped("\xFFz"), "\xEF\xBF\xBDz");
+  EXPECT_EQ(escaped("\xEF\xBF\xBE"), "\xEF\xBF\xBD");
+}
+
+TEST(XmlText, LeavesOtherCharactersAsTheyAre) {
+  EXPECT_EQ(escaped("r\xC3\xA9seau \xF0\x9F\x8C\x90"), "r\xC3\xA9seau \xF0\x9F\x8C\x90");
+}
+
+TEST(XmlValue, IsNothingWhereItIsNull) { EXPECT_EQ(elementOf(Value::null(schema::Type::String)), ""); }
+
+TEST(XmlValue, HasOneElementForEachElementOfAnArray) {
+  EXPECT_EQ(elementOf(Value::array(schema::Type::Uint16, {Scalar(std::uint64_t{8}), Scalar()})),
+            "<VALUE.ARRAY><VALUE>8</VALUE><VALUE.NULL/></VALUE.ARRAY>");
+  EXPECT_EQ(elementOf(Value::textArray({})), "<VALUE.ARRAY></VALUE.ARRAY>");
+}
+
+TEST(XmlValue, WritesEachTypeAsTheStandardSpellsIt) {
+  EXPECT_EQ(elementOf(Value::boolean(true)), "<VALUE>TRUE</VALUE>");
+  EXPECT_EQ(elementOf(Value::signedNumber(-5)), "<VALUE>-5</VALUE>");
+  EXPECT_EQ(elementOf(Value::unsignedNumber(18446744073709551615U)), "<VALUE>18446744073709551615</VALUE>");
+  Value character = Value::text("");
+  character.type = schema::Type::Char16;
+  character.scalar = u'<';
+  EXPECT_EQ(elementOf(character), "<VALUE>&lt;</VALUE>");
+  character.scalar = static_cast<char16_t>(0xD800);
+  EXPECT_EQ(elementOf(character), "<VALUE>\xEF\xBF\xBD</VALUE>");
+  Value real = Value::text("");
+  real.type = schema::Type::Real64;
+  real.scalar = 0.5;
+  EXPECT_EQ(elementOf(real), "<VALUE>0.5</VALUE>");
+}
+
+TEST(XmlPath, SaysAsMuchAsThePathDoes) {
+  ObjectPath path{"", "", "C", {{"K", Value::text("v")}}};
+  const std::string name =
+      R"(<INSTANCENAME CLASSNAME="C"><KEYBINDING NAME="K"><KEYVALUE VALUETYPE="string" TYPE="string">v</KEYVALUE></KEYBINDING></INSTANCENAME>)";
+  EXPECT_EQ(pathElement(path), name);
+  path.nameSpace = "root/cimv2";
+  const std::string nameSpace =
+      R"(<LOCALNAMESPACEPATH><NAMESPACE NAME="root"/><NAMESPACE NAME="cimv2"/></LOCALNAMESPACEPATH>)";
+  EXPECT_EQ(pathElement(path), "<LOCALINSTANCEPATH>" + nameSpace + name + "</LOCALINSTANCEPATH>");
+  path.host = "h";
+  EXPECT_EQ(pathElement(path),
+            "<INSTANCEPATH><NAMESPACEPATH><HOST>h</HOST>" + nameSpace + "</NAMESPACEPATH>" + name + "</INSTANCEPATH>");
+}
+
+TEST(XmlPath, WithoutKeysIsAnEmptyInstanceName) {
+  EXPECT_EQ(pathElement({"", "", "C", {}}), R"(<INSTANCENAME CLASSNAME="C"></INSTANCENAME>)");
+}
+
+TEST(XmlPath, WritesNumbersAndReferencesAmongItsKeys) {
+  const ObjectPath path{
+      "",
+      "",
+      "C",
+      {{"N", Value::unsignedNumber(3)}, {"B", Value::boolean(false)}, {"R", Value::reference({"", "", "D", {}})}}};
+  EXPECT_EQ(
+      pathElement(path),
+      R"(<INSTANCENAME CLASSNAME="C"><KEYBINDING NAME="N"><KEYVALUE VALUETYPE="numeric" TYPE="uint64">3</KEYVALUE>)"
+      R"(</KEYBINDING><KEYBINDING NAME="B"><KEYVALUE VALUETYPE="boolean" TYPE="boolean">FALSE</KEYVALUE></KEYBINDING>)"
+      R"(<KEYBINDING NAME="R"><VALUE.REFERENCE><INSTANCENAME CLASSNAME="D"></INSTANCENAME></VALUE.REFERENCE>)"
+      R"(</KEYBINDING></INSTANCENAME>)");
+}
+
+TEST(XmlInstance, NamesTheTypeOfEachProperty) {
+  EXPECT_EQ(instanceElement({"P", Value::text("a<b"), nullptr}),
+            R"(<INSTANCE CLASSNAME="C"><PROPERTY NAME="P" TYPE="string"><VALUE>a&lt;b</VALUE></PROPERTY></INSTANCE>)");
+  EXPECT_EQ(instanceElement({"P", Value::null(schema::Type::Uint8), nullptr}),
+            R"(<INSTANCE CLASSNAME="C"><PROPERTY NAME="P" TYPE="uint8"></PROPERTY></INSTANCE>)");
+  EXPECT_EQ(instanceElement({"P", Value::null(schema::Type::String, true), nullptr}),
+            R"(<INSTANCE CLASSNAME="C"><PROPERTY.ARRAY NAME="P" TYPE="string"></PROPERTY.ARRAY></INSTANCE>)");
+}
+
+TEST(XmlInstance, WritesTheClassOfAReferenceAndTheOriginOfAProperty) {
+  const auto classes = std::make_unique<schema::ClassRepository>();
+  schema::ClassProperty declaration;
+  declaration.referenceClass = "D";
+  EXPECT_EQ(instanceElement({"R", Value::reference({"", "", "E", {}}), &declaration}),
+            R"(<INSTANCE CLASSNAME="C"><PROPERTY.REFERENCE NAME="R" REFERENCECLASS="D"><VALUE.REFERENCE>)"
+            R"(<INSTANCENAME CLASSNAME="E"></INSTANCENAME></VALUE.REFERENCE></PROPERTY.REFERENCE></INSTANCE>)");
+
+  schema::ClassDeclaration base;
+  base.name = "Base";
+  base.properties.emplace_back().name = "P";
+  ASSERT_FALSE(classes->add(base));
+  const schema::ClassProperty* known = classes->find("Base")->findProperty("P");
+  EXPECT_EQ(
+      instanceElement({"P", Value::text("v"), known}, true),
+      R"(<INSTANCE CLASSNAME="C"><PROPERTY NAME="P" TYPE="string" CLASSORIGIN="Base"><VALUE>v</VALUE></PROPERTY></INSTANCE>)");
+}
+
+TEST(XmlInstance, HoldsAnEmbeddedInstanceAsItsText) {
+  Value value = Value::text("");
+  Instance inner;
+  inner.path.className = "I";
+  value.scalar = broker::Boxed<Instance>(inner);
+  EXPECT_EQ(instanceElement({"E", value, nullptr}),
+            R"(<INSTANCE CLASSNAME="C"><PROPERTY NAME="E" TYPE="string" EmbeddedObject="instance"><VALUE>)"
+            R"(&lt;INSTANCE CLASSNAME=&quot;I&quot;&gt;&lt;/INSTANCE&gt;</VALUE></PROPERTY></INSTANCE>)");
+}
+
+}  // namespace
+}  // namespace zorva::cimxml

@@ -1,0 +1,180 @@
+#include "cli/Change.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <optional>
+
+#include "agent/Agent.h"
+#include "cli/Failure.h"
+#include "cli/HostView.h"
+#include "cli/SettingFile.h"
+#include "cli/Table.h"
+#include "cli/Text.h"
+#include "cli/ValueText.h"
+#include "schema/Names.h"
+
+namespace zorva::cli {
+
+namespace {
+
+/// The settings that go into the interface's file, and the key of each there.
+struct FileSetting {
+  const char* className;
+  const char* property;
+  const char* key;
+};
+
+constexpr FileSetting kFileSettings[] = {
+    {"ZORVA_DNSSettingData", "RequestedHostname", "HOSTNAME"},
+    {"ZORVA_DNSSettingData", "DomainName", "DOMAINNAME"},
+    {"ZORVA_DNSSettingData", "DNSServerAddresses", "DNSSERVERS"},
+    {"ZORVA_DNSSettingData", "ConfigurationName", "CONFIG_NAME"},
+    {"ZORVA_DNSGeneralSettingData", "DNSSuffixesToAppend", "DNSSUFFIXES"},
+    {"ZORVA_DNSGeneralSettingData", "ConfigurationName", "CONFIG_NAME"},
+};
+
+const FileSetting* fileSetting(const broker::Instance& instance, std::string_view property) {
+  const auto found = std::find_if(std::begin(kFileSettings), std::end(kFileSettings), [&](const FileSetting& each) {
+    return instance.path.className == each.className && schema::sameName(each.property, property);
+  });
+  return found == std::end(kFileSettings) ? nullptr : found;
+}
+
+bool isEmpty(const broker::Value& value) {
+  if (value.isNull) return true;
+  return value.isArray ? value.elements.empty() : scalarText(value.scalar).empty();
+}
+
+/// What a client of the providers sees as the same: null and empty are one to them.
+bool sameEffect(const broker::Value& wanted, const broker::Value* now) {
+  if (now == nullptr || isEmpty(*now)) return isEmpty(wanted);
+  return wanted.isArray == now->isArray && wanted.scalar == now->scalar && wanted.elements == now->elements;
+}
+
+/// Why the providers, asked to change this setting, would find no place for it in the file; nothing where they would.
+std::optional<std::string> missingPlace(const SettingFile& file, const std::string& interface, const char* key) {
+  const std::string name = printable(interface);
+  if (!file.exists()) {
+    return printable(file.path()) + " does not exist; 'zorvactl ifcfg init " + name + "' makes it, then repeat this";
+  }
+  try {
+    if (file.hasPlaceFor(key)) return std::nullopt;
+  } catch (const Failure& failure) {
+    return std::string(failure.what());
+  }
+  return printable(file.path()) + " has no line " + key + "=; add it, or let 'zorvactl ifcfg init " + name +
+         " --force' write all six, then repeat this";
+}
+
+/// For each change the reason why it will come to nothing, where that can be told beforehand.
+std::vector<std::string> foreseenProblems(const Session& session, const broker::Instance& instance,
+                                          const std::vector<broker::Property>& changes) {
+  std::vector<std::string> problems(changes.size());
+  for (std::size_t i = 0; i < changes.size(); ++i) {
+    const FileSetting* setting = fileSetting(instance, changes[i].name);
+    if (setting == nullptr) continue;
+    const bool isGeneral = instance.path.className == "ZORVA_DNSGeneralSettingData";
+    const std::string interface = isGeneral ? interfaceOfHostSettings(session).value_or("") : interfaceOfSetting(instance);
+    if (interface.empty()) {
+      problems[i] = "the interface has no name, and so no file";
+      continue;
+    }
+    problems[i] = missingPlace(SettingFile(interface), interface, setting->key).value_or("");
+  }
+  return problems;
+}
+
+/// Why a change did not take effect although nothing was foreseen.
+std::string unforeseenProblem(const broker::Instance& instance, const broker::Property& change) {
+  if (change.value.isNull) return "null leaves the value as it is; " + change.name + "= empties it";
+  if (fileSetting(instance, change.name) != nullptr) {
+    return "the file cannot be written, or does not hold the value as it was given";
+  }
+  if (instance.path.className == "ZORVA_DNSProtocolEndPoint" &&
+      (change.name == "DNSSuffixesToAppend" || change.name == "DomainName" || change.name == "Hostname")) {
+    return "the agent could not store it in " + printable(zorvagent::dataDirectory()) + "; is that there and writable?";
+  }
+  return "the provider changes no " + change.name;
+}
+
+broker::Instance instanceToSend(const broker::Instance& found, const std::vector<broker::Property>& changes,
+                                bool only) {
+  broker::Instance sent;
+  sent.path = found.path;
+  sent.declaration = found.declaration;
+  const auto isChanged = [&changes](const broker::Property& property) {
+    return std::any_of(changes.begin(), changes.end(),
+                       [&](const broker::Property& change) { return schema::sameName(change.name, property.name); });
+  };
+  for (const broker::Property& property : found.properties) {
+    if (!only && !isChanged(property) && !isEmpty(property.value)) sent.properties.push_back(property);
+  }
+  sent.properties.insert(sent.properties.end(), changes.begin(), changes.end());
+  return sent;
+}
+
+broker::Instance fetched(Session& session, const broker::ObjectPath& path) {
+  broker::Instance instance;
+  const broker::Status status = session.broker().getInstance(path, {}, instance);
+  if (!status.ok()) {
+    throw operationFailure(shortPathText(path), status, "zorvactl names " + path.className + " lists what there is");
+  }
+  return instance;
+}
+
+void warnOfLostChanges(const broker::Instance& now, const std::vector<broker::Property>& changes,
+                       const std::vector<std::string>& foreseen) {
+  for (std::size_t i = 0; i < changes.size(); ++i) {
+    const bool isThere = sameEffect(changes[i].value, now.property(changes[i].name));
+    if (foreseen[i].empty() && isThere) continue;
+    tellWarning(changes[i].name + " was not stored: " +
+                (foreseen[i].empty() ? unforeseenProblem(now, changes[i]) : foreseen[i]));
+  }
+}
+
+}  // namespace
+
+broker::Instance changeInstance(Session& session, const broker::ObjectPath& path,
+                                const std::vector<broker::Property>& changes, const ChangeOptions& options) {
+  const broker::Instance found = fetched(session, path);
+  broker::Instance sent = instanceToSend(found, changes, options.only);
+  const std::vector<std::string> foreseen = foreseenProblems(session, found, changes);
+  if (options.dryRun) {
+    for (std::size_t i = 0; i < changes.size(); ++i) {
+      if (!foreseen[i].empty()) tellWarning(changes[i].name + " would not be stored: " + foreseen[i]);
+    }
+    return sent;
+  }
+  std::optional<std::vector<std::string>> propertyList;
+  if (options.only) {
+    propertyList.emplace();
+    for (const broker::Property& change : changes) propertyList->push_back(change.name);
+  }
+  const broker::Status status = session.broker().modifyInstance(sent, propertyList);
+  if (!status.ok()) {
+    throw operationFailure("modifying " + shortPathText(found.path), status,
+                           status.rc == 4 ? "a host or domain name may hold letters, digits, '-', '_' and '.'" : "");
+  }
+  broker::Instance now = fetched(session, found.path);
+  warnOfLostChanges(now, changes, foreseen);
+  return now;
+}
+
+void writeChanges(const Session& session, const broker::Instance& instance,
+                  const std::vector<broker::Property>& changes, const ChangeOptions& options) {
+  write(std::string(options.dryRun ? "would send " : "") + printable(shortPathText(instance.path)) + "\n");
+  Table table({}, 2);
+  const auto add = [&table](const broker::Property& property, Style style) {
+    table.add({Cell(property.name, style), valueText(property.value, property.declaration)});
+  };
+  for (const broker::Property& property : instance.properties) {
+    const bool isChanged = std::any_of(changes.begin(), changes.end(), [&](const broker::Property& change) {
+      return schema::sameName(change.name, property.name);
+    });
+    if (isChanged || options.dryRun) add(property, isChanged ? Style::Heading : Style::Plain);
+  }
+  write(table.text(session.layout()));
+}
+
+}  // namespace zorva::cli

@@ -1,0 +1,106 @@
+// modify, invoke.
+#include <algorithm>
+
+#include "cli/Assignments.h"
+#include "cli/Change.h"
+#include "cli/Commands.h"
+#include "cli/Failure.h"
+#include "cli/JsonOutput.h"
+#include "cli/Paths.h"
+#include "cli/ResultWriter.h"
+#include "cli/Session.h"
+#include "cli/Text.h"
+#include "cli/ValueText.h"
+
+namespace zorva::cli {
+
+namespace {
+
+template <class Element>
+std::string namesOf(const std::vector<Element>& elements) {
+  std::vector<std::string> names;
+  for (const auto& element : elements) names.push_back(element->name);
+  return joined(names, ", ");
+}
+
+broker::Property parseChange(const schema::Class& declared, const Assignment& assignment) {
+  const schema::ClassProperty* property = declared.findProperty(assignment.name);
+  if (property == nullptr) {
+    throw Failure(ExitCode::WrongUsage,
+                  "the class " + declared.name() + " has no property " + printable(assignment.name),
+                  "it has " + namesOf(declared.properties()));
+  }
+  if (property->isKey) {
+    throw Failure(ExitCode::WrongUsage, property->name + " is a key of " + declared.name() + " and cannot be changed");
+  }
+  return {property->name, parseValue({property->name, property->type, property->isArray}, assignment.texts), property};
+}
+
+const schema::ClassMethod& methodNamed(const schema::Class& declared, const std::string& name) {
+  const schema::ClassMethod* method = declared.findMethod(name);
+  if (method != nullptr) return *method;
+  throw Failure(ExitCode::WrongUsage, "the class " + declared.name() + " has no method " + printable(name),
+                declared.methods().empty() ? "it has none" : "it has " + namesOf(declared.methods()));
+}
+
+broker::NamedValue parseParameter(const schema::ClassMethod& method, const Assignment& assignment) {
+  for (const schema::Parameter& parameter : method.parameters) {
+    if (!schema::sameName(parameter.name, assignment.name)) continue;
+    return {parameter.name, parseValue({parameter.name, parameter.type, parameter.isArray}, assignment.texts)};
+  }
+  std::vector<std::string> names;
+  for (const schema::Parameter& parameter : method.parameters) names.push_back(parameter.name);
+  throw Failure(ExitCode::WrongUsage, method.name + " has no parameter " + printable(assignment.name),
+                names.empty() ? "it has none" : "it has " + joined(names, ", "));
+}
+
+std::string methodTable(const broker::MethodResult& result, const Layout& layout) {
+  Table table;
+  table.add({"ReturnValue", valueText(result.returnValue, nullptr)});
+  for (const broker::NamedValue& output : result.output) table.add({output.name, valueText(output.value, nullptr)});
+  return table.text(layout);
+}
+
+}  // namespace
+
+void modifyInstance(const Arguments& arguments) {
+  requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "modify");
+  Session session(arguments);
+  const std::vector<Assignment> assignments = parseAssignments(arguments.values);
+  const broker::ObjectPath path = resolvePath(session, arguments.target);
+  const schema::Class& declared = session.classNamed(path.className);
+  std::vector<broker::Property> changes;
+  for (const Assignment& assignment : assignments) changes.push_back(parseChange(declared, assignment));
+
+  const ChangeOptions options{arguments.only, arguments.dryRun};
+  const broker::Instance instance = changeInstance(session, path, changes, options);
+  if (arguments.output == OutputFormat::Json) {
+    write(instanceJson(instance, 0) + "\n");
+  } else {
+    writeChanges(session, instance, changes, options);
+  }
+}
+
+void invokeMethod(const Arguments& arguments) {
+  requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "invoke");
+  Session session(arguments);
+  const std::vector<Assignment> assignments = parseAssignments(arguments.values);
+  const broker::ObjectPath path = resolvePath(session, arguments.target);
+  const schema::ClassMethod& method = methodNamed(session.classNamed(path.className), arguments.method);
+  std::vector<broker::NamedValue> input;
+  for (const Assignment& assignment : assignments) input.push_back(parseParameter(method, assignment));
+
+  broker::MethodResult result;
+  requireDone(method.name + " of " + shortPathText(path),
+              session.broker().invokeMethod(path, method.name, input, result));
+  write(arguments.output == OutputFormat::Json ? methodResultJson(result) + "\n"
+                                               : methodTable(result, session.layout()));
+  if (path.className == "ZORVA_DNSProtocolEndPoint") {
+    tellNote(method.name + " checks and answers, and changes nothing; 'zorvactl dns', 'domain', 'suffixes' and 'modify' do");
+  }
+  if (const std::string value = valueText(result.returnValue, nullptr); value != "0" && !result.returnValue.isNull) {
+    throw Failure(ExitCode::Failed, method.name + " returned " + value);
+  }
+}
+
+}  // namespace zorva::cli

@@ -1,0 +1,12 @@
+#pragma once
+
+#include <string>
+
+#include "broker/Value.h"
+
+namespace zorva::cli {
+
+/// An instance as MOF (DSP0004), ended by a line feed; a reference is the text of its path.
+std::string instanceMof(const broker::Instance& instance);
+
+}  // namespace zorva::cli
