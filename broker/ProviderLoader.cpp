@@ -98,27 +98,43 @@ ProviderLoader::Library* ProviderLoader::open(const std::string& name, Status& s
 }
 
 template <class Mi>
-const Mi* ProviderLoader::find(const ProviderEntry& entry, std::atomic<const Mi*> Provider::*slot, const char* kind,
+const Mi* ProviderLoader::find(const ProviderEntry& entry, std::atomic<const Mi*> Provider::*slot, MiKind kind,
                                Status& status) {
   Provider& provider = providerOf(entry);
   if (const Mi* made = (provider.*slot).load(std::memory_order_acquire)) return made;
   const std::lock_guard lock(mutex_);
-  const Mi* made = make(provider, slot, kind, status);
-  if (made != nullptr) makeAll(provider);
-  return made;
+  if (const Mi* made = (provider.*slot).load(std::memory_order_relaxed)) return made;
+  if (provider.isBeingMade) {
+    status = {CMPI_RC_ERR_FAILED, provider.prefix + " asks for itself while it is being made"};
+    return nullptr;
+  }
+  provider.isBeingMade = true;
+  makeAll(provider, kind, status);
+  provider.isBeingMade = false;
+  return (provider.*slot).load(std::memory_order_relaxed);
 }
 
-void ProviderLoader::makeAll(Provider& provider) {
+void ProviderLoader::makeAll(Provider& provider, MiKind wanted, Status& status) {
   Status unheeded;  // a kind that cannot be made is told to who asks for it
-  if ((provider.kinds & InstanceMi) != 0) make(provider, &Provider::instance, "InstanceMI", unheeded);
-  if ((provider.kinds & AssociationMi) != 0) make(provider, &Provider::association, "AssociationMI", unheeded);
-  if ((provider.kinds & MethodMi) != 0) make(provider, &Provider::method, "MethodMI", unheeded);
+  const auto wants = [&](MiKind kind, bool made) { return (provider.kinds & kind) != 0 && !made; };
+  const auto statusOf = [&](MiKind kind) -> Status& { return kind == wanted ? status : unheeded; };
+  const CMPIInstanceMI* instance = provider.instance.load();
+  const CMPIAssociationMI* association = provider.association.load();
+  const CMPIMethodMI* method = provider.method.load();
+  if (wants(InstanceMi, instance != nullptr)) {
+    instance = make<CMPIInstanceMI>(provider, "InstanceMI", statusOf(InstanceMi));
+  }
+  if (wants(AssociationMi, association != nullptr)) {
+    association = make<CMPIAssociationMI>(provider, "AssociationMI", statusOf(AssociationMi));
+  }
+  if (wants(MethodMi, method != nullptr)) method = make<CMPIMethodMI>(provider, "MethodMI", statusOf(MethodMi));
+  provider.instance.store(instance, std::memory_order_release);
+  provider.association.store(association, std::memory_order_release);
+  provider.method.store(method, std::memory_order_release);
 }
 
 template <class Mi>
-const Mi* ProviderLoader::make(Provider& provider, std::atomic<const Mi*> Provider::*slot, const char* kind,
-                               Status& status) {
-  if (const Mi* made = (provider.*slot).load(std::memory_order_relaxed)) return made;
+const Mi* ProviderLoader::make(const Provider& provider, const char* kind, Status& status) {
   Library* library = open(provider.library, status);
   if (library == nullptr) return nullptr;
   const std::string function = provider.prefix + "_Create_" + kind;
@@ -146,20 +162,19 @@ const Mi* ProviderLoader::make(Provider& provider, std::atomic<const Mi*> Provid
     return nullptr;
   }
   status = {};
-  (provider.*slot).store(mi, std::memory_order_release);
   return mi;
 }
 
 const CMPIInstanceMI* ProviderLoader::instanceMi(const ProviderEntry& entry, Status& status) {
-  return find(entry, &Provider::instance, "InstanceMI", status);
+  return find(entry, &Provider::instance, InstanceMi, status);
 }
 
 const CMPIAssociationMI* ProviderLoader::associationMi(const ProviderEntry& entry, Status& status) {
-  return find(entry, &Provider::association, "AssociationMI", status);
+  return find(entry, &Provider::association, AssociationMi, status);
 }
 
 const CMPIMethodMI* ProviderLoader::methodMi(const ProviderEntry& entry, Status& status) {
-  return find(entry, &Provider::method, "MethodMI", status);
+  return find(entry, &Provider::method, MethodMi, status);
 }
 
 }  // namespace zorva::broker

@@ -43,6 +43,7 @@ class ProviderLoader {
     std::string library;
     std::string nameSpace;
     unsigned kinds = 0;
+    bool isBeingMade = false;  // guarded by mutex_
     std::atomic<const CMPIInstanceMI*> instance = nullptr;
     std::atomic<const CMPIAssociationMI*> association = nullptr;
     std::atomic<const CMPIMethodMI*> method = nullptr;
@@ -50,11 +51,12 @@ class ProviderLoader {
 
   Provider& providerOf(const ProviderEntry& entry) const;
   Library* open(const std::string& name, Status& status);
-  void makeAll(Provider& provider);
+  /// Makes what the provider lacks of its kinds and publishes it. `status` is that of the kind `wanted`.
+  void makeAll(Provider& provider, MiKind wanted, Status& status);
   template <class Mi>
-  const Mi* find(const ProviderEntry& entry, std::atomic<const Mi*> Provider::*slot, const char* kind, Status& status);
+  const Mi* make(const Provider& provider, const char* kind, Status& status);
   template <class Mi>
-  const Mi* make(Provider& provider, std::atomic<const Mi*> Provider::*slot, const char* kind, Status& status);
+  const Mi* find(const ProviderEntry& entry, std::atomic<const Mi*> Provider::*slot, MiKind kind, Status& status);
   template <class Mi>
   bool cleanUp(Provider& provider, std::atomic<const Mi*> Provider::*slot) noexcept;
 

@@ -246,8 +246,14 @@ Told callWith(World& world, R (*function)(Args...), std::tuple<Args...>& argumen
   constexpr bool hasStatus = (std::is_same_v<Args, CMPIStatus*> || ...);
   if constexpr (std::is_same_v<R, CMPIStatus>) {
     return {true, std::apply(function, arguments).rc};
-  } else {
+  } else if constexpr (std::is_void_v<R>) {
     std::apply(function, arguments);
+    return {};
+  } else {
+    [[maybe_unused]] R given = std::apply(function, arguments);
+    if constexpr (std::is_pointer_v<R> && isHandle<std::remove_pointer_t<R>>) {
+      if (given != nullptr) given->ft->release(given);  // a clone must be; for all else it is harmless
+    }
     return {hasStatus, world.status.rc};
   }
 }

@@ -55,7 +55,13 @@ struct Telling {
 /// Reads the command line. The only part of the program that knows the options.
 std::variant<Invocation, Telling> readArguments(int argc, const char* const* argv);
 
-/// The words that can stand behind the words given, for the completion of a shell: subcommands, or options.
-std::vector<std::string> completionWords(const std::vector<std::string>& words);
+/// What can stand at a place of the command line.
+struct Completion {
+  std::vector<std::string> words;  ///< subcommands, options, or the values of an option
+  std::string kind;  ///< what else can: "CLASS", "PATH", "INTERFACE", "FILE"; empty: nothing that is known
+};
+
+/// What can stand behind these words.
+Completion completionBehind(const std::vector<std::string>& words);
 
 }  // namespace zorva::cli

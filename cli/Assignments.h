@@ -19,8 +19,8 @@ struct TypedName {
 
 /// The value that the texts stand for: one text for a scalar, any number for an array. A single empty text is the empty
 /// array; a single text "null" is CIM's null. Numbers are decimal, or hexadecimal behind 0x; booleans true and false;
-/// date-times the 25 characters of DSP0004 5.2.4; references path texts. Throws Failure (wrong usage) for a text that is
-/// of another type, holds control characters or is no UTF-8, and for several texts of a scalar.
+/// date-times the 25 characters of DSP0004 5.2.4; references path texts. Throws Failure (wrong usage) for a text that
+/// is of another type, holds control characters or is no UTF-8, and for several texts of a scalar.
 broker::Value parseValue(const TypedName& declared, const std::vector<std::string>& texts);
 
 /// One name with everything that was given for it, in the order in which names first appear.

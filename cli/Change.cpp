@@ -75,7 +75,8 @@ std::vector<std::string> foreseenProblems(const Session& session, const broker::
     const FileSetting* setting = fileSetting(instance, changes[i].name);
     if (setting == nullptr) continue;
     const bool isGeneral = instance.path.className == "ZORVA_DNSGeneralSettingData";
-    const std::string interface = isGeneral ? interfaceOfHostSettings(session).value_or("") : interfaceOfSetting(instance);
+    const std::string interface =
+        isGeneral ? interfaceOfHostSettings(session).value_or("") : interfaceOfSetting(instance);
     if (interface.empty()) {
       problems[i] = "the interface has no name, and so no file";
       continue;
@@ -128,8 +129,8 @@ void warnOfLostChanges(const broker::Instance& now, const std::vector<broker::Pr
   for (std::size_t i = 0; i < changes.size(); ++i) {
     const bool isThere = sameEffect(changes[i].value, now.property(changes[i].name));
     if (foreseen[i].empty() && isThere) continue;
-    tellWarning(changes[i].name + " was not stored: " +
-                (foreseen[i].empty() ? unforeseenProblem(now, changes[i]) : foreseen[i]));
+    tellWarning(changes[i].name +
+                " was not stored: " + (foreseen[i].empty() ? unforeseenProblem(now, changes[i]) : foreseen[i]));
   }
 }
 

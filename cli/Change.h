@@ -6,8 +6,8 @@
 #include "broker/Value.h"
 #include "cli/Session.h"
 
-// Changes of instances, by ModifyInstance, as a person needs them: one setting changes and the others stay, and what came
-// of it is told.
+// Changes of instances, by ModifyInstance, as a person needs them: one setting changes and the others stay, and what
+// came of it is told.
 
 namespace zorva::cli {
 
@@ -16,9 +16,10 @@ struct ChangeOptions {
   bool dryRun = false;  ///< tell what would be sent, and send nothing
 };
 
-/// Reads the instance, puts `changes` into it and sends it back; an empty value that is not among the changes is left out,
-/// since sending it would set it. Reads the instance again and warns on stderr of each change that came to nothing, with
-/// what to do. Gives the instance as it is afterwards (or, on a dry run, as it would be sent). Throws Failure.
+/// Reads the instance, puts `changes` into it and sends it back; an empty value that is not among the changes is left
+/// out, since sending it would set it. Reads the instance again and warns on stderr of each change that came to
+/// nothing, with what to do. Gives the instance as it is afterwards (or, on a dry run, as it would be sent). Throws
+/// Failure.
 broker::Instance changeInstance(Session& session, const broker::ObjectPath& path,
                                 const std::vector<broker::Property>& changes, const ChangeOptions& options);
 

@@ -96,7 +96,8 @@ void invokeMethod(const Arguments& arguments) {
   write(arguments.output == OutputFormat::Json ? methodResultJson(result) + "\n"
                                                : methodTable(result, session.layout()));
   if (path.className == "ZORVA_DNSProtocolEndPoint") {
-    tellNote(method.name + " checks and answers, and changes nothing; 'zorvactl dns', 'domain', 'suffixes' and 'modify' do");
+    tellNote(method.name +
+             " checks and answers, and changes nothing; 'zorvactl dns', 'domain', 'suffixes' and 'modify' do");
   }
   if (const std::string value = valueText(result.returnValue, nullptr); value != "0" && !result.returnValue.isNull) {
     throw Failure(ExitCode::Failed, method.name + " returned " + value);

@@ -1,7 +1,8 @@
 #include "cli/HostView.h"
 
+#include <sys/stat.h>
+
 #include <algorithm>
-#include <filesystem>
 
 #include "agent/Agent.h"
 #include "cli/Failure.h"
@@ -48,10 +49,14 @@ EndpointRow endpointRow(const broker::Instance& instance) {
   return row;
 }
 
+bool fileStands(const std::string& interface) {
+  struct stat status {};
+  return ::stat((zorvagent::dataDirectory() + "ifcfg-" + interface).c_str(), &status) == 0;
+}
+
 /// The file alone decides: where it stands, a key that it lacks is an empty value and not the host's.
 SettingSource sourceOf(const std::string& interface, bool hasHostValue, bool hasValue) {
-  std::error_code ignored;
-  if (std::filesystem::exists(interfaceFile(interface), ignored)) return SettingSource::File;
+  if (fileStands(interface)) return SettingSource::File;
   return hasHostValue && hasValue ? SettingSource::Host : SettingSource::None;
 }
 
@@ -129,8 +134,6 @@ const char* sourceName(SettingSource source) noexcept {
   }
   return "-";
 }
-
-std::string interfaceFile(const std::string& interface) { return zorvagent::dataDirectory() + "ifcfg-" + interface; }
 
 std::string interfaceOfSetting(const broker::Instance& setting) {
   const std::string id = propertyText(setting, "InstanceID");

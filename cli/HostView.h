@@ -74,7 +74,4 @@ std::string interfaceOfSetting(const broker::Instance& setting);
 /// service processor. Nothing where there is none.
 std::optional<std::string> interfaceOfHostSettings(const Session& session);
 
-/// The file of an interface's settings.
-std::string interfaceFile(const std::string& interface);
-
 }  // namespace zorva::cli

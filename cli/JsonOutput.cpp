@@ -124,6 +124,44 @@ std::string hostViewJson(const HostView& view) {
   return dumped(json);
 }
 
+std::string textsJson(const std::vector<std::string>& texts) { return dumped(ofTexts(texts)); }
+
+std::string settingFileJson(const std::string& path, const std::vector<SettingLine>& lines) {
+  Json json;
+  json["file"] = asUtf8(path);
+  json["lines"] = ofRows(lines, [](const SettingLine& line) {
+    return Json{{"key", asUtf8(line.key)}, {"value", asUtf8(line.value)}};
+  });
+  return dumped(json);
+}
+
+std::string overlayJson(const std::vector<OverlayRow>& rows) {
+  return dumped(ofRows(rows, [](const OverlayRow& row) {
+    Json entry;
+    entry["node"] = asUtf8(row.path);
+    entry["property"] = row.property;
+    entry["value"] = row.isList ? ofTexts(row.values) : Json(asUtf8(row.values.empty() ? "" : row.values.front()));
+    return entry;
+  }));
+}
+
+std::string graphJson(const Graph& graph) {
+  Json json;
+  json["objects"] = ofRows(graph.objects, [](const GraphObject& object) {
+    Json entry;
+    entry["path"] = asUtf8(broker::pathText(object.path));
+    if (!object.problem.empty()) entry["problem"] = asUtf8(object.problem);
+    return entry;
+  });
+  json["associations"] = ofRows(graph.associations, [](const GraphAssociation& each) {
+    Json entry;
+    entry["class"] = each.className;
+    for (const GraphEnd* end : {&each.from, &each.to}) entry[end->role] = end->object;
+    return entry;
+  });
+  return dumped(json);
+}
+
 std::string classRowsJson(const std::vector<ClassRow>& rows) { return dumped(ofClassRows(rows)); }
 
 }  // namespace zorva::cli

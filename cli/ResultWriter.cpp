@@ -96,8 +96,9 @@ class XmlWriter : public ResultWriter {
   void begin() {
     if (begun_) return;
     begun_ = true;
-    write("<?xml version=\"1.0\" encoding=\"utf-8\"?>\n"
-          "<CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.4\"><DECLARATION><DECLGROUP.WITHPATH>\n");
+    write(
+        "<?xml version=\"1.0\" encoding=\"utf-8\"?>\n"
+        "<CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.4\"><DECLARATION><DECLGROUP.WITHPATH>\n");
   }
 
   bool begun_ = false;
@@ -105,7 +106,8 @@ class XmlWriter : public ResultWriter {
 
 }  // namespace
 
-std::unique_ptr<ResultWriter> makeResultWriter(OutputFormat format, const Layout& layout, Count count, Results results) {
+std::unique_ptr<ResultWriter> makeResultWriter(OutputFormat format, const Layout& layout, Count count,
+                                               Results results) {
   if (results == Results::Names && (format == OutputFormat::Mof || format == OutputFormat::Xml)) {
     throw Failure(ExitCode::WrongUsage, std::string("names of instances cannot be written as ") + formatName(format),
                   "use --output json, or ask for the instances themselves");

@@ -33,18 +33,6 @@ std::string defaultProviderDirectory() {
   return {};
 }
 
-/// What the agent throws for files that a person wrote is that person's to mend; all else is a failure.
-template <class Work>
-auto asFailure(Work work) {
-  try {
-    return work();
-  } catch (const zorvagent::ConfigError& error) {
-    throw Failure(ExitCode::WrongUsage, error.what());
-  } catch (const std::runtime_error& error) {
-    throw Failure(ExitCode::Failed, printable(error.what()));
-  }
-}
-
 std::string similarNames(const schema::ClassRepository& classes, std::string_view name) {
   std::vector<std::string> similar;
   std::string wanted(name);

@@ -2,13 +2,17 @@
 
 #include <functional>
 #include <memory>
+#include <stdexcept>
 #include <string>
 #include <string_view>
 
+#include "agent/config/Config.h"
 #include "agent/tree/TreeSnapshot.h"
 #include "broker/Broker.h"
 #include "cli/Arguments.h"
+#include "cli/Failure.h"
 #include "cli/Table.h"
+#include "cli/Text.h"
 
 // One run of the program: the agent with its configuration, and the broker with the providers, each set up when a
 // command first needs it. Belongs to one thread.
@@ -62,6 +66,21 @@ class Session {
   std::shared_ptr<const schema::ClassRepository> classes_;
   std::unique_ptr<broker::Broker> broker_;
 };
+
+/// Does the work with what the agent throws turned into Failure: wrong files are the user's to mend, all else is a
+/// failure.
+template <class Work>
+auto asFailure(Work work) {
+  try {
+    return work();
+  } catch (const zorvagent::ConfigError& error) {
+    throw Failure(ExitCode::WrongUsage, error.what());
+  } catch (const Failure&) {
+    throw;
+  } catch (const std::runtime_error& error) {
+    throw Failure(ExitCode::Failed, printable(error.what()));
+  }
+}
 
 /// What of each instance the arguments want.
 broker::Selection selectionOf(const Arguments& arguments);

@@ -72,15 +72,13 @@ class DraftFile {
 
 /// Makes a name that was put into a directory last.
 void syncDirectoryOf(const std::string& path) {
-  const Descriptor directory(
-      ::open(path.substr(0, path.rfind('/') + 1).c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+  const Descriptor directory(::open(path.substr(0, path.rfind('/') + 1).c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
   if (directory.isOpen()) ::fsync(directory.get());
 }
 
 void requireLine(const std::string& path, const SettingLine& line) {
-  const bool isBroken = std::any_of(line.value.begin(), line.value.end(), [](char c) {
-    return static_cast<unsigned char>(c) < 0x20 || c == 0x7F;
-  });
+  const bool isBroken = std::any_of(line.value.begin(), line.value.end(),
+                                    [](char c) { return static_cast<unsigned char>(c) < 0x20 || c == 0x7F; });
   if (isBroken) fail(path, line.key + " would hold control characters: '" + printable(line.value) + "'");
 }
 
@@ -97,7 +95,8 @@ std::string textOr(const std::string* text) { return text == nullptr ? std::stri
 
 const char* bootProtocol(const zorvagent::AddressList& addresses) {
   const auto from = [&addresses](zorvagent::AddressOrigin origin) {
-    return std::any_of(addresses.begin(), addresses.end(), [origin](const auto& each) { return each.origin == origin; });
+    return std::any_of(addresses.begin(), addresses.end(),
+                       [origin](const auto& each) { return each.origin == origin; });
   };
   if (from(zorvagent::AddressOrigin::Dhcp)) return "dhcp";
   return from(zorvagent::AddressOrigin::Static) ? "static" : "none";
@@ -169,8 +168,8 @@ void SettingFile::write(const std::vector<SettingLine>& lines, bool replaces) co
   const DraftFile draft(path_);
   if (!draft.fill(text)) fail(path_, std::string("cannot be written: ") + std::strerror(errno));
   // A link never takes the place of what stands there.
-  const int placed = replaces ? ::rename(draft.path().c_str(), path_.c_str())
-                              : ::link(draft.path().c_str(), path_.c_str());
+  const int placed =
+      replaces ? ::rename(draft.path().c_str(), path_.c_str()) : ::link(draft.path().c_str(), path_.c_str());
   if (placed != 0) {
     const int error = errno;
     fail(path_, error == EEXIST ? "stands already" : std::string("cannot be written: ") + std::strerror(error),

@@ -8,8 +8,9 @@
 #include "agent/tree/TreeSnapshot.h"
 #include "cli/Session.h"
 
-// The file of an interface's settings, "ifcfg-NAME" in the agent's data directory: lines of KEY=VALUE. While it stands, it
-// is where the providers read the settings, whatever the host says; the providers change values in it but add no keys.
+// The file of an interface's settings, "ifcfg-NAME" in the agent's data directory: lines of KEY=VALUE. While it stands,
+// it is where the providers read the settings, whatever the host says; the providers change values in it but add no
+// keys.
 
 namespace zorva::cli {
 
@@ -24,7 +25,8 @@ struct SettingLine {
 
 class SettingFile {
  public:
-  /// The file of that interface, whether it stands or not. Throws Failure (wrong usage) for a name that no file can have.
+  /// The file of that interface, whether it stands or not. Throws Failure (wrong usage) for a name that no file can
+  /// have.
   explicit SettingFile(const std::string& interface);
 
   const std::string& path() const noexcept { return path_; }
@@ -39,8 +41,8 @@ class SettingFile {
   /// True where the providers, asked to change this key, would change a line. Throws as read does.
   bool hasPlaceFor(std::string_view key) const;
 
-  /// Puts a file of these lines in place, whole or not at all. Throws Failure where it cannot, where a line would not be
-  /// one, or, without `replaces`, where the file stands already.
+  /// Puts a file of these lines in place, whole or not at all. Throws Failure where it cannot, where a line would not
+  /// be one, or, without `replaces`, where the file stands already.
   void write(const std::vector<SettingLine>& lines, bool replaces) const;
 
  private:

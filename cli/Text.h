@@ -25,8 +25,8 @@ std::vector<std::string> wrapped(std::string_view text, std::size_t width);
 /// `text` with blanks behind it up to `width` columns.
 std::string padded(std::string_view text, std::size_t width);
 
-/// `text` for a document that must be UTF-8: a byte that is none stands as the character U+10EE00 plus the byte, as in the
-/// agent's own documents.
+/// `text` for a document that must be UTF-8: a byte that is none stands as the character U+10EE00 plus the byte, as in
+/// the agent's own documents.
 std::string asUtf8(std::string_view text);
 
 /// The texts with `separator` between them.

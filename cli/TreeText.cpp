@@ -47,15 +47,15 @@ const char* originWord(zorvagent::AddressOrigin origin) noexcept {
 }
 
 struct ValueWords {
-  std::string operator()(unsigned int number) const { return std::to_string(number); }
-  std::string operator()(const std::string& text) const { return text; }
-  std::string operator()(const zorvagent::SharedStrings& list) const { return joined(*list, ", "); }
-  std::string operator()(const zorvagent::SharedAddresses& list) const {
+  std::vector<std::string> operator()(unsigned int number) const { return {std::to_string(number)}; }
+  std::vector<std::string> operator()(const std::string& text) const { return {text}; }
+  std::vector<std::string> operator()(const zorvagent::SharedStrings& list) const { return *list; }
+  std::vector<std::string> operator()(const zorvagent::SharedAddresses& list) const {
     std::vector<std::string> texts;
     for (const zorvagent::InterfaceAddress& each : *list) {
       texts.push_back(each.address + "/" + std::to_string(each.prefixLength) + originWord(each.origin));
     }
-    return joined(texts, ", ");
+    return texts;
   }
 };
 
@@ -91,7 +91,7 @@ std::string propertyLines(const Node& node, std::size_t indent, const Layout& la
   for (const PropertyWord& known : kProperties) {
     const Property* property = node.find(known.number);
     if (property == nullptr) continue;
-    const std::string value = std::visit(ValueWords(), property->value);
+    const std::string value = joined(valueTexts(property->value), ", ");
     if (property->overlaid) {
       table.add({known.word, value, Cell("(set, not the host's own)", Style::Warning)});
     } else {
@@ -102,6 +102,8 @@ std::string propertyLines(const Node& node, std::size_t indent, const Layout& la
 }
 
 }  // namespace
+
+std::vector<std::string> valueTexts(const zorvagent::PropertyValue& value) { return std::visit(ValueWords(), value); }
 
 std::string treeText(const TreeSnapshot& tree, const Layout& layout) {
   std::string out = styled(printable(tree.systemName()), Style::Heading, layout) + "\n";

@@ -23,7 +23,7 @@ unsigned short hooked(unsigned short fetched, Objects& objects,
 FetchHook::FetchHook() { activeHook = this; }
 FetchHook::~FetchHook() { activeHook = nullptr; }
 
-// The symbols of the two functions in the factory, and of those that take and give their places.
+// By the linker's names the function in the factory, and the one that takes its place.
 #define ZV_WRAPPED(function, symbol)                            \
   decltype(function) real_##function __asm__("__real_" symbol); \
   decltype(function) wrapped_##function __asm__("__wrap_" symbol);

@@ -1,0 +1,58 @@
+#pragma once
+
+#include <cstddef>
+#include <map>
+#include <string>
+#include <vector>
+
+#include "broker/Value.h"
+#include "cli/Session.h"
+
+// The objects and associations that a CIM client can reach, found by walking the CIM operations alone.
+
+namespace zorva::cli {
+
+/// One end of an association.
+struct GraphEnd {
+  std::string role;
+  std::size_t object = 0;  ///< its place in Graph::objects
+};
+
+struct GraphAssociation {
+  std::string className;
+  GraphEnd from;
+  GraphEnd to;
+};
+
+struct GraphObject {
+  broker::ObjectPath path;
+  std::string problem;  ///< why it cannot be fetched; empty: it can
+};
+
+struct Graph {
+  std::vector<GraphObject> objects;  ///< in the order in which they were found
+  std::vector<GraphAssociation> associations;
+};
+
+/// Walks from these objects along references to all that they lead to. Every object that a reference names is fetched
+/// once, to see whether it is there.
+Graph walkGraph(Session& session, const std::vector<broker::ObjectPath>& roots);
+
+/// The names of all instances of all classes that are no associations, computer systems first. A class whose provider
+/// cannot be asked is passed over with a warning.
+std::vector<broker::ObjectPath> allObjects(Session& session);
+
+/// A line for each association with an end that cannot be fetched: the association, the role, the path and why.
+std::vector<std::string> danglingReferences(const Graph& graph);
+
+/// "ZORVA_DNSProtocolEndPoint eth0": the class and the key that tells instances apart.
+std::string objectLabel(const broker::ObjectPath& path);
+
+/// An indented tree: each object once in full, with its associations and what they lead to under it, and the dangling
+/// references at the end.
+std::string graphText(const Graph& graph, const Layout& layout);
+
+/// The graph in Graphviz's language. Dangling ends are dashed.
+std::string graphDot(const Graph& graph);
+
+}  // namespace zorva::cli

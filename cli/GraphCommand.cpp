@@ -1,0 +1,99 @@
+// graph.
+#include <fcntl.h>
+#include <spawn.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <csignal>
+#include <cstring>
+
+#include "cli/Commands.h"
+#include "cli/Failure.h"
+#include "cli/Graph.h"
+#include "cli/JsonOutput.h"
+#include "cli/Paths.h"
+#include "cli/ResultWriter.h"
+#include "cli/Session.h"
+
+extern char** environ;
+
+namespace zorva::cli {
+
+namespace {
+
+/// Starts Graphviz's dot with its input at `input`; its output is that of this process.
+pid_t startDot(int input) {
+  const char* const words[] = {"dot", "-Tsvg", nullptr};
+  posix_spawn_file_actions_t actions;
+  ::posix_spawn_file_actions_init(&actions);
+  ::posix_spawn_file_actions_adddup2(&actions, input, STDIN_FILENO);
+  pid_t child = -1;
+  const int error = ::posix_spawnp(&child, words[0], &actions, nullptr, const_cast<char* const*>(words), environ);
+  ::posix_spawn_file_actions_destroy(&actions);
+  if (error == 0) return child;
+  throw Failure(ExitCode::Failed, std::string("cannot start Graphviz's dot: ") + std::strerror(error),
+                "install it (apt-get install graphviz), or use --output dot");
+}
+
+/// Writes to a pipe whose reader may end early.
+void feed(int pipe, std::string_view text) {
+  while (!text.empty()) {
+    const ssize_t written = ::write(pipe, text.data(), text.size());
+    if (written < 0 && errno != EINTR) return;
+    if (written > 0) text.remove_prefix(static_cast<std::size_t>(written));
+  }
+}
+
+void writeSvg(const std::string& dot) {
+  flushOutput();
+  int ends[2];
+  if (::pipe2(ends, O_CLOEXEC) != 0) {
+    throw Failure(ExitCode::Failed, std::string("cannot make a pipe: ") + std::strerror(errno));
+  }
+  std::signal(SIGPIPE, SIG_IGN);
+  pid_t child = -1;
+  try {
+    child = startDot(ends[0]);
+  } catch (...) {
+    ::close(ends[0]);
+    ::close(ends[1]);
+    throw;
+  }
+  ::close(ends[0]);
+  feed(ends[1], dot);
+  ::close(ends[1]);
+  int status = 0;
+  while (::waitpid(child, &status, 0) < 0 && errno == EINTR) {
+  }
+  if (!WIFEXITED(status) || WEXITSTATUS(status) != 0) {
+    throw Failure(ExitCode::Failed, "Graphviz's dot did not draw the graph", "--output dot shows what it was given");
+  }
+}
+
+}  // namespace
+
+void showGraph(const Arguments& arguments) {
+  requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json, OutputFormat::Dot, OutputFormat::Svg},
+                "graph");
+  Session session(arguments);
+  const std::vector<broker::ObjectPath> roots =
+      arguments.target.empty() ? allObjects(session)
+                               : std::vector<broker::ObjectPath>{resolvePath(session, arguments.target)};
+  const Graph graph = walkGraph(session, roots);
+  switch (arguments.output) {
+    case OutputFormat::Json:
+      write(graphJson(graph) + "\n");
+      return;
+    case OutputFormat::Dot:
+      write(graphDot(graph));
+      return;
+    case OutputFormat::Svg:
+      writeSvg(graphDot(graph));
+      return;
+    default:
+      write(graphText(graph, session.layout()));
+  }
+}
+
+}  // namespace zorva::cli

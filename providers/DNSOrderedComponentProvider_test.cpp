@@ -1,0 +1,583 @@
+#include "providers/SettingAssociations.h"
+
+namespace ZV::Test {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::ElementsAreArray;
+using ::testing::IsEmpty;
+using ::testing::SizeIs;
+
+const char* const kAssociation = "ZORVA_DNSOrderedComponent";
+const char* const kBuilder = "DNSOrderedComponentCMPIInstances";
+
+const char* const kNoAssignmentPath = "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.";
+const char* const kNoAssignmentPathForNames = "Create CMPIObjectPath failed for ComputerSystem.";
+const char* const kNoAssignments = "CBEnumInstanceNames Failed for the target Class";
+const char* const kNoSettingsInBuilder = "getAllDNSSettingDataCMPIObjectPaths failed";
+const char* const kNoSettingPaths = "getAllDNSSettingDataCMPIObjectPaths Failed";
+const char* const kNoSettings = "getAllDNSSettingDataCMPIInstances Failed";
+const char* const kBadSetting = "CMPIObjectPath is NULL for DNS Client";
+const char* const kNoPath = "Create CMPIObjectPath failed for                         DNSOrderedComponent.";
+const char* const kMalformed = "Invalid InstanceId";
+
+const Path kAssignment = ipAssignmentPath("Computer%eth0%ipv4");
+const Path kSetting = settingPath("Computer%eth0");
+
+class OrderedComponent : public AssociationTest {
+ protected:
+  OrderedComponent() : AssociationTest(orderedComponent()) {}
+
+  void serveAssignments(const std::vector<std::string>& instanceIDs) {
+    std::vector<Instance> all;
+    for (const std::string& instanceID : instanceIDs) all.push_back(objectOf(ipAssignmentPath(instanceID)));
+    broker.serve(kIpAssignmentClass, all);
+  }
+  void installOne() {
+    world.host().nic("eth0").install();
+    serveAssignments({"Computer%eth0%ipv4"});
+  }
+  // Two assignments of eth0, one of eth1; the first setting is that of eth1.
+  void installTwo() {
+    world.host().nic("eth1").nic("eth0").install();
+    serveAssignments({"Computer%eth0%ipv4", "Computer%eth1%ipv4", "Computer%eth0%ipv6"});
+  }
+
+  static std::string target(const std::string& text) { return "log 4000 VARIABLE target = " + text; }
+  Story setAll(const std::string& instance, const std::string& group, const std::string& part) const {
+    return tell({setEnds(instance, group, part), sequence(instance, 2)});
+  }
+  static std::string builderLine(const char* form) {
+    return std::string("log 3000 ") + form + " " + kBuilder + ", ref=ADDR properties=0 ctx=ADDR instances=ADDR";
+  }
+  Story builtOne() const {
+    return tell({{builderLine("ENTERING"), newPath(kIpAssignmentClass), "enumerateInstanceNames(OP1)"},
+                 newSettingPath("OP2", "Computer%eth0"),
+                 {"E1.getNext()", target("Computer%eth0")},
+                 placed("OP2"),
+                 newHostPath("OP4", kAssociation),
+                 {"newInstance(OP4)", R"(I1.setPropertyFilter(null, {"GroupComponent", "PartComponent"}))"},
+                 setAll("I1", "OP3", "OP2"),
+                 {builderLine("EXITING")}});
+  }
+
+  using Operation = std::function<Outcome()>;
+  std::vector<Operation> enumerations() {
+    return {[this] { return enumerateInstanceNames(); }, [this] { return enumerateInstances(); }};
+  }
+  std::vector<Operation> instanceOperations() {
+    std::vector<Operation> all = enumerations();
+    all.push_back([this] { return getInstance(pairOf(kAssignment, kSetting)); });
+    return all;
+  }
+  std::vector<Operation> allFrom(const Path& source) {
+    return {[this, source] { return associators(source); }, [this, source] { return associatorNames(source); },
+            [this, source] { return references(source); }, [this, source] { return referenceNames(source); }};
+  }
+  // All that asks the broker for assignments.
+  std::vector<Operation> allThatEnumerate() {
+    std::vector<Operation> all = instanceOperations();
+    for (const Operation& run : allFrom(kSetting)) all.push_back(run);
+    return all;
+  }
+  static std::size_t handedOut(const Calls& calls) {
+    return calls.count("returnInstance") + calls.count("returnObjectPath");
+  }
+};
+
+// --- Enumerations
+
+TEST_F(OrderedComponent, InstancesAreBuiltFirstAndHandedOutThen) {
+  installOne();
+  const Outcome all = enumerateInstances();
+  EXPECT_EQ(
+      tell({entry(operation("EnumInstances")), builtOne(), {"returnInstance(I1)"}, done(operation("EnumInstances"))}),
+      storyOf(all));
+  EXPECT_EQ(CMPI_RC_OK, all.rc);
+}
+
+TEST_F(OrderedComponent, NamesAreThoseOfTheBuiltInstances) {
+  installOne();
+  const Outcome names = enumerateInstanceNames();
+  EXPECT_EQ(tell({entry(operation("EnumInstanceNames")),
+                  builtOne(),
+                  {"I1.getObjectPath()", "returnObjectPath(OP5)"},
+                  done(operation("EnumInstanceNames"))}),
+            storyOf(names));
+  EXPECT_EQ(CMPI_RC_OK, names.rc);
+}
+
+TEST_F(OrderedComponent, AssignmentsComeAsTheBrokerGivesThemEachWithTheSettingOfItsInterface) {
+  installTwo();
+  const Outcome all = enumerateInstances();
+  EXPECT_THAT(pairsOf(all), ElementsAre("Computer%eth0%ipv4 > Computer%eth0", "Computer%eth1%ipv4 > Computer%eth1",
+                                        "Computer%eth0%ipv6 > Computer%eth0"));
+  EXPECT_EQ(pairsOf(all), pairsOf(enumerateInstanceNames()));
+  for (const Instance& one : all.instances()) {
+    EXPECT_THAT(one.names(), ElementsAre("GroupComponent", "PartComponent", "AssignedSequence"));
+    EXPECT_EQ(uint64(2), one["AssignedSequence"]);
+  }
+}
+
+TEST_F(OrderedComponent, AssignmentStaysAsTheBrokerGaveIt) {
+  world.host().nic("eth0").install();
+  Instance served = objectOf(kAssignment);
+  served.path.host = "elsewhere";
+  broker.serve(kIpAssignmentClass, {served});
+  const Instance one = enumerateInstances().instances().at(0);
+  EXPECT_EQ("elsewhere", one["GroupComponent"].path().host);
+  EXPECT_EQ("host1", one["PartComponent"].path().host);
+}
+
+TEST_F(OrderedComponent, MatchDoesNotEndTheSearchAmongTheSettings) {
+  installOne();
+  FetchHook hook;
+  hook.settingPaths = [this](std::vector<CMPIObjectPath*>& paths) {
+    paths.push_back(broker.make(kSetting, "again"));
+    return 0;
+  };
+  EXPECT_THAT(enumerateInstances().instances(), SizeIs(2));
+  EXPECT_THAT(associatorNames(kAssignment).paths(), SizeIs(2));
+  EXPECT_THAT(references(kAssignment).instances(), SizeIs(2));
+}
+
+TEST_F(OrderedComponent, HostWithoutSettingsHasNoAssociation) {
+  world.install();
+  serveAssignments({"Computer%eth0%ipv4", "Computer"});
+  for (const Operation& run : enumerations()) {
+    const Outcome outcome = run();
+    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
+    EXPECT_EQ(0U, handedOut(outcome.calls));
+    EXPECT_THAT(outcome.lines.ofCategory(under.category).ofKind(LineKind::Variable), SizeIs(2));
+  }
+}
+
+TEST_F(OrderedComponent, EveryFailureOfTheBuilderEndsEmptyAndShowsNoCode) {
+  installTwo();
+  const auto expectEmpty = [this](const Outcome& outcome, const char* text) {
+    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked", text));
+    EXPECT_EQ(0U, handedOut(outcome.calls));
+    EXPECT_FALSE(outcome.lines.exited(kBuilder));
+  };
+  for (const Operation& run : enumerations()) {
+    for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
+      expectEmpty(failing(newPath(kIpAssignmentClass), mode, run), kNoAssignmentPath);
+      expectEmpty(failing(newPath(kAssociation), mode, run, 3), kNoPath);
+    }
+    expectEmpty(failing("enumerateInstanceNames", Mode::RcAndNull, run), kNoAssignments);
+    expectEmpty(failing("enumerateInstanceNames", Mode::SetRc, run), kNoAssignments);
+    expectEmpty(losingHandles(kSettingClass, kAssociation, run), kBadSetting);
+  }
+}
+
+TEST_F(OrderedComponent, BuilderWithoutSettingPathsMarksItsExitAsAnOperationDoes) {
+  installOne();
+  const Outcome outcome = failing(newPath(kSettingClass), Mode::RcAndNull, [this] { return enumerateInstances(); });
+  EXPECT_EQ(tell({entry(operation("EnumInstances")),
+                  {builderLine("ENTERING"), newPath(kIpAssignmentClass), "enumerateInstanceNames(OP1)",
+                   newPath(kSettingClass) + " fails: rc set and null", error(kNoSettingsInBuilder)},
+                  exitMark(kBuilder),
+                  done(operation("EnumInstances"))}),
+            storyOf(outcome));
+  EXPECT_EQ(CMPI_RC_OK, outcome.rc);
+}
+
+TEST_F(OrderedComponent, FailureOfTheBuilderLeavesTheSearchForOneDoneAndEmpty) {
+  installTwo();
+  const Outcome outcome = failing(
+      newPath(kAssociation), Mode::RcAndNull, [this] { return getInstance(pairOf(kAssignment, kSetting)); }, 2);
+  EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked", kNoPath));
+  EXPECT_THAT(outcome.instances(), IsEmpty());
+}
+
+// --- Which assignment belongs to which setting
+
+struct Cut {
+  const char* assignment;
+  const char* target;
+  const char* setting;  // that it belongs to; null for none
+};
+
+// The settings of a host with interfaces eth0, "eth0%" and one without a name, whose InstanceID is absent.
+const Cut kCuts[] = {
+    {"Computer%eth0%ipv4", "Computer%eth0", "Computer%eth0"},
+    {"Computer%eth0%", "Computer%eth0", "Computer%eth0"},
+    {"Computer%eth0%%", "Computer%eth0%", "Computer%eth0%"},
+    {"Computer%eth0%a%b", "Computer%eth0%a", nullptr},
+    {"Computer%eth0", "Computer", nullptr},
+    {"Computer%ETH0%ipv4", "Computer%ETH0", nullptr},
+    {"Computer%eth01%ipv4", "Computer%eth01", nullptr},
+    {"BMC%eth0%ipv4", "BMC%eth0", nullptr},
+    {"%Computer%eth0%ipv4", "%Computer%eth0", nullptr},
+    {"%", "", ""},
+    {"%ipv4", "", ""},
+    {"%%", "%", nullptr},
+};
+
+TEST_F(OrderedComponent, TextBeforeTheLastPercentSignIsCompared) {
+  world.host().nic("eth0").nic("eth0%").nic("x", {.isUnnamed = true}).install();
+  for (const Cut& cut : kCuts) {
+    SCOPED_TRACE(cut.assignment);
+    serveAssignments({cut.assignment});
+    std::vector<std::string> pairs;
+    if (cut.setting != nullptr) pairs = {std::string(cut.assignment) + " > " + cut.setting};
+
+    const Outcome all = enumerateInstances();
+    EXPECT_THAT(all.lines.ofCategory(under.category).ofKind(LineKind::Variable).briefs(),
+                ElementsAre(target(cut.target).substr(4)));
+    EXPECT_EQ(pairs.size(), all.instances().size());
+    const Path source = ipAssignmentPath(cut.assignment);
+    for (const Operation& run : allFrom(source)) {
+      const Outcome outcome = run();
+      EXPECT_EQ(pairs.size(), handedOut(outcome.calls));
+      EXPECT_EQ("done, marked", endOf(outcome).at(1));
+    }
+    if (cut.setting == nullptr || *cut.setting == '\0') continue;  // a path without keys is told by its class
+    EXPECT_EQ(pairs, pairsOf(all));
+    EXPECT_EQ(pairs, pairsOf(references(source)));
+    EXPECT_EQ(pairs, pairsOf(referenceNames(source)));
+    EXPECT_EQ(pairs, pairsOf(referenceNames(settingPath(cut.setting))));
+    EXPECT_THAT(textsOf(associators(source).instances(), "InstanceID"), ElementsAre(cut.setting));
+    EXPECT_THAT(textsOf(associatorNames(source).paths(), "InstanceID"), ElementsAre(cut.setting));
+    EXPECT_THAT(textsOf(associators(settingPath(cut.setting)).instances(), "InstanceID"), ElementsAre(cut.assignment));
+    EXPECT_THAT(textsOf(associatorNames(settingPath(cut.setting)).paths(), "InstanceID"), ElementsAre(cut.assignment));
+  }
+}
+
+// Settings of this host have a "%"; others could do without.
+TEST_F(OrderedComponent, AssignmentWithoutPercentSignIsComparedWholeByTheBuilderAndStopsAllElse) {
+  world.host().nic("eth0").install();
+  serveAssignments({"plain"});
+  FetchHook hook;
+  hook.settingPaths = [this](std::vector<CMPIObjectPath*>& paths) {
+    paths.push_back(broker.make(settingPath("plain"), "plain"));
+    return 0;
+  };
+  for (const Operation& run : enumerations()) {
+    const Outcome outcome = run();
+    EXPECT_THAT(pairsOf(outcome), ElementsAre("plain > plain"));
+    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
+  }
+  for (const Path& source : {settingPath("plain"), ipAssignmentPath("plain")}) {
+    for (const Operation& run : allFrom(source)) {
+      const Outcome outcome = run();
+      EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "not done, not marked", kMalformed));
+      EXPECT_EQ(0U, handedOut(outcome.calls));
+    }
+  }
+}
+
+TEST_F(OrderedComponent, AssignmentWithoutItsKeyHasTheEmptyText) {
+  world.host().nic("eth0").install();
+  broker.serve(kIpAssignmentClass, {Instance(kIpAssignmentClass), objectOf(kAssignment)});
+  EXPECT_THAT(pairsOf(enumerateInstances()), ElementsAre("Computer%eth0%ipv4 > Computer%eth0"));
+  for (const Operation& run : allFrom(kSetting)) {
+    EXPECT_THAT(endOf(run()), ElementsAre("CMPI_RC_ERR_NOT_FOUND", "not done, not marked", kMalformed));
+  }
+  for (const Operation& run : allFrom(Path(kIpAssignmentClass))) {
+    const Outcome outcome = run();
+    EXPECT_EQ("not done, not marked", endOf(outcome).at(1));
+    EXPECT_THAT(complaintsOf(outcome), ElementsAre(kMalformed));
+  }
+}
+
+TEST_F(OrderedComponent, SettingWithoutItsKeyHasTheEmptyText) {
+  world.host().nic("eth0").install();
+  serveAssignments({"Computer%eth0%ipv4", "%ipv4"});
+  for (const Operation& run : allFrom(Path(kSettingClass))) EXPECT_EQ(1U, handedOut(run().calls));
+}
+
+TEST_F(OrderedComponent, SourceIsTestedOnlyOnceThereIsACandidate) {
+  world.install();
+  for (const Operation& run : allFrom(ipAssignmentPath("malformed"))) {
+    EXPECT_THAT(endOf(run()), ElementsAre("CMPI_RC_OK", "done, marked"));
+  }
+  world.nic("eth0").install();
+  for (const Operation& run : allFrom(ipAssignmentPath("malformed"))) {
+    EXPECT_THAT(endOf(run()), ElementsAre("CMPI_RC_OK", "not done, not marked", kMalformed));
+  }
+}
+
+TEST_F(OrderedComponent, MalformedAssignmentStopsTheOperationAndWhatWentOutStays) {
+  world.host().nic("eth0").install();
+  serveAssignments({"Computer%eth0%ipv4", "malformed", "Computer%eth0%ipv6"});
+  for (const Operation& run : allFrom(kSetting)) {
+    const Outcome outcome = run();
+    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "not done, not marked", kMalformed));
+    EXPECT_EQ(1U, outcome.instances().size() + outcome.paths().size());
+  }
+  EXPECT_THAT(pairsOf(enumerateInstances()),
+              ElementsAre("Computer%eth0%ipv4 > Computer%eth0", "Computer%eth0%ipv6 > Computer%eth0"));
+}
+
+TEST_F(OrderedComponent, KeyOfTheSourceIsReadBeforeTheFarEndIsLookedAt) {
+  installOne();
+  for (const Outcome& outcome : {associators(kAssignment, {.assocClass = "ZORVA_DNSGenOrderedComponent"}),
+                                 associatorNames(kAssignment, {.assocClass = "ZORVA_DNSGenOrderedComponent"})}) {
+    EXPECT_THAT(outcome.calls.only({"getKey"}), ElementsAre(R"(ref.getKey("InstanceID"))"));
+    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
+  }
+}
+
+// --- From an assignment to its setting
+
+TEST_F(OrderedComponent, SettingIsMadeFromTheSourceWithThePropertiesThatWereAskedFor) {
+  installOne();
+  const Outcome outcome = associators(kAssignment, {.properties = {"InstanceID"}});
+  EXPECT_EQ(tell({entry(operation("Associators")),
+                  newHostPath("OP1", kSettingClass),
+                  newSetting("OP2", "I1", kSettingClass, "Computer%eth0"),
+                  {"I1.getObjectPath()", "returnInstance(I1)"},
+                  done(operation("Associators"))}),
+            storyOf(outcome));
+  EXPECT_EQ(CMPI_RC_OK, outcome.rc);
+}
+
+TEST_F(OrderedComponent, SettingsPathGoesOutAsItCame) {
+  installOne();
+  const Outcome outcome = associatorNames(kAssignment);
+  EXPECT_EQ(tell({entry(operation("AssociatorNames")),
+                  newHostPath("OP1", kSettingClass),
+                  newSettingPath("OP2", "Computer%eth0"),
+                  {"returnObjectPath(OP2)"},
+                  done(operation("AssociatorNames"))}),
+            storyOf(outcome));
+  EXPECT_EQ(CMPI_RC_OK, outcome.rc);
+}
+
+TEST_F(OrderedComponent, ReferenceOfAnAssignmentCostsAnInstanceForEveryCandidate) {
+  installTwo();
+  const Outcome outcome = references(kAssignment);
+  EXPECT_EQ(tell({entry(operation("References")),
+                  newHostPath("OP1", kSettingClass),
+                  {newPath(kAssociation)},  // without a host
+                  newSettingPath("OP3", "Computer%eth1"),
+                  newSettingPath("OP4", "Computer%eth0"),
+                  {"newInstance(OP2)", "newInstance(OP2)"},
+                  placed("OP4"),
+                  setAll("I2", "ref", "OP4"),
+                  {"returnInstance(I2)"},
+                  done(operation("References"))}),
+            storyOf(outcome));
+  EXPECT_EQ(CMPI_RC_OK, outcome.rc);
+}
+
+TEST_F(OrderedComponent, NameOfAReferenceOfAnAssignmentIsAskedOfTheInstance) {
+  installTwo();
+  const Outcome outcome = referenceNames(kAssignment);
+  EXPECT_EQ(tell({entry(operation("ReferenceNames")),
+                  newHostPath("OP1", kSettingClass),
+                  {newPath(kAssociation)},
+                  newSettingPath("OP3", "Computer%eth1"),
+                  newSettingPath("OP4", "Computer%eth0"),
+                  {"newInstance(OP2)", "newInstance(OP2)"},
+                  placed("OP4"),
+                  setAll("I2", "ref", "OP4"),
+                  returnedPath("I2", "OP5"),
+                  done(operation("ReferenceNames"))}),
+            storyOf(outcome));
+  EXPECT_EQ(CMPI_RC_OK, outcome.rc);
+}
+
+TEST_F(OrderedComponent, InstanceIsMadeBeforeTheSourceIsTested) {
+  installOne();
+  for (const Outcome& outcome :
+       {references(ipAssignmentPath("malformed")), referenceNames(ipAssignmentPath("malformed"))}) {
+    EXPECT_THAT(complaintsOf(outcome), ElementsAre(kMalformed));
+    EXPECT_EQ(1U, outcome.calls.count("newInstance"));
+  }
+}
+
+TEST_F(OrderedComponent, FailedFetchOfSettingPathsIsToldAndLeftOpen) {
+  installTwo();
+  const std::vector<Operation> all = allFrom(kAssignment);
+  for (const Operation& run : std::vector<Operation>(all.begin() + 1, all.end())) {
+    const Outcome outcome = failing(newPath(kSettingClass), Mode::RcAndNull, run, 3);
+    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "not done, not marked", kNoSettingPaths));
+    EXPECT_EQ(0U, handedOut(outcome.calls));
+  }
+}
+
+TEST_F(OrderedComponent, FailedFetchOfSettingsIsToldAndLeftOpen) {
+  installOne();
+  FetchHook hook;
+  hook.settings = [](auto&) { return 1; };
+  const Outcome outcome = associators(kAssignment);
+  EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "not done, not marked", kNoSettings));
+  EXPECT_EQ(0U, handedOut(outcome.calls));
+}
+
+// --- From a setting to its assignments
+
+TEST_F(OrderedComponent, AssignmentsAreAskedForWithoutAPropertyListAndTheirPathsTellTheirKeys) {
+  world.host().nic("eth0").install();
+  serveAssignments({"Computer%eth1%ipv4", "Computer%eth0%ipv4"});
+  const Outcome outcome = associators(kSetting, {.properties = {"InstanceID"}});
+  EXPECT_EQ(tell({entry(operation("Associators")),
+                  newHostPath("OP1", kIpAssignmentClass),
+                  {newPath(kIpAssignmentClass), "enumerateInstances(OP2)", "E1.getNext()", "I1.getObjectPath()",
+                   "E1.getNext()", "I2.getObjectPath()", "returnInstance(I2)"},
+                  done(operation("Associators"))}),
+            storyOf(outcome));
+  EXPECT_EQ(CMPI_RC_OK, outcome.rc);
+}
+
+TEST_F(OrderedComponent, AssignmentsPathsGoOutAsTheyCame) {
+  world.host().nic("eth0").install();
+  serveAssignments({"Computer%eth1%ipv4", "Computer%eth0%ipv4"});
+  const Outcome outcome = associatorNames(kSetting);
+  EXPECT_EQ(tell({entry(operation("AssociatorNames")),
+                  newHostPath("OP1", kIpAssignmentClass),
+                  {newPath(kIpAssignmentClass), "enumerateInstanceNames(OP2)", "E1.getNext()", "E1.getNext()",
+                   "returnObjectPath(OP4)"},
+                  done(operation("AssociatorNames"))}),
+            storyOf(outcome));
+  EXPECT_EQ(CMPI_RC_OK, outcome.rc);
+}
+
+TEST_F(OrderedComponent, ReferenceOfASettingHoldsAPathWithoutKeysInThePlaceOfTheSource) {
+  world.host().nic("eth0").install();
+  serveAssignments({"Computer%eth1%ipv4", "Computer%eth0%ipv4"});
+  const Outcome outcome = references(kSetting);
+  EXPECT_EQ(
+      tell({entry(operation("References")),
+            newHostPath("OP1", kIpAssignmentClass),
+            {newPath(kAssociation), "enumerateInstanceNames(OP1)", "E1.getNext()", "E1.getNext()", "newInstance(OP2)"},
+            setAll("I1", "OP4", "OP1"),
+            {"returnInstance(I1)"},
+            done(operation("References"))}),
+      storyOf(outcome));
+  EXPECT_EQ(CMPI_RC_OK, outcome.rc);
+}
+
+TEST_F(OrderedComponent, NameOfAReferenceOfASettingHoldsTheSource) {
+  world.host().nic("eth0").install();
+  serveAssignments({"Computer%eth1%ipv4", "Computer%eth0%ipv4"});
+  const Outcome outcome = referenceNames(kSetting);
+  EXPECT_EQ(
+      tell({entry(operation("ReferenceNames")),
+            newHostPath("OP1", kIpAssignmentClass),
+            {newPath(kAssociation), "enumerateInstanceNames(OP1)", "E1.getNext()", "E1.getNext()", "newInstance(OP2)"},
+            setAll("I1", "OP4", "ref"),
+            returnedPath("I1", "OP5"),
+            done(operation("ReferenceNames"))}),
+      storyOf(outcome));
+  EXPECT_EQ(CMPI_RC_OK, outcome.rc);
+}
+
+TEST_F(OrderedComponent, SettingLeadsToEveryAssignmentOfItsInterface) {
+  installTwo();
+  const std::vector<std::string> both = {"Computer%eth0%ipv4", "Computer%eth0%ipv6"};
+  EXPECT_EQ(both, textsOf(associators(kSetting).instances(), "InstanceID"));
+  EXPECT_EQ(both, textsOf(associatorNames(kSetting).paths(), "InstanceID"));
+  EXPECT_THAT(pairsOf(references(kSetting)),
+              ElementsAreArray({both[0] + " > " + kIpAssignmentClass, both[1] + " > " + kIpAssignmentClass}));
+  EXPECT_THAT(pairsOf(referenceNames(kSetting)),
+              ElementsAreArray({both[0] + " > Computer%eth0", both[1] + " > Computer%eth0"}));
+}
+
+TEST_F(OrderedComponent, PropertyListNarrowsSettingsAndNeitherAssignmentsNorReferences) {
+  world.host().nic("eth0", usualNic()).install();
+  broker.serve(kIpAssignmentClass, {objectOf(kAssignment).with("AddressOrigin", uint16(3))});
+  EXPECT_THAT(associators(kAssignment, {.properties = {"DomainName"}}).instances().at(0).names(),
+              ElementsAre("InstanceID", "DomainName"));
+  EXPECT_THAT(associators(kSetting, {.properties = {"InstanceID"}}).instances().at(0).names(),
+              ElementsAre("InstanceID", "AddressOrigin"));
+  for (const Path& source : {kAssignment, kSetting}) {
+    const Instance one = references(source, {.properties = {"PartComponent"}}).instances().at(0);
+    EXPECT_THAT(one.names(), ElementsAre("GroupComponent", "PartComponent", "AssignedSequence"));
+    EXPECT_EQ(uint64(2), one["AssignedSequence"]);
+  }
+}
+
+TEST_F(OrderedComponent, PathToAskWithThatCannotBeMadeIsToldAndLeftOpen) {
+  installTwo();
+  for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
+    const char* code = mode == Mode::RcAndNull ? "CMPI_RC_ERR_FAILED" : "CMPI_RC_OK";
+    EXPECT_THAT(endOf(failing(
+                    newPath(kIpAssignmentClass), mode, [this] { return associators(kSetting); }, 2)),
+                ElementsAre(code, "not done, not marked", kNoAssignmentPath));
+    EXPECT_THAT(endOf(failing(
+                    newPath(kIpAssignmentClass), mode, [this] { return associatorNames(kSetting); }, 2)),
+                ElementsAre(code, "not done, not marked", kNoAssignmentPathForNames));
+  }
+}
+
+// --- The provider of the assignments
+
+TEST_F(OrderedComponent, MissingProviderIsShownByTheAssociationOperationsAlone) {
+  world.host().nic("eth0").install();
+  for (const Operation& run : allFrom(kSetting)) {
+    const Outcome outcome = run();
+    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_ERR_INVALID_CLASS", "not done, not marked", kNoAssignments));
+    EXPECT_EQ(0U, handedOut(outcome.calls));
+  }
+  for (const Operation& run : instanceOperations()) {
+    EXPECT_THAT(endOf(run()), ElementsAre("CMPI_RC_OK", "done, marked", kNoAssignments));
+  }
+  for (const Operation& run : allFrom(kAssignment)) {
+    const Outcome outcome = run();
+    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
+    EXPECT_EQ(1U, handedOut(outcome.calls));
+  }
+}
+
+TEST_F(OrderedComponent, FailedEnumerationDeliversNothingEvenWhereItGaveSome) {
+  installOne();
+  broker.serve(kIpAssignmentClass, {objectOf(kAssignment)}).rc = CMPI_RC_ERR_NOT_FOUND;
+  for (const Operation& run : allFrom(kSetting)) {
+    const Outcome outcome = run();
+    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_ERR_NOT_FOUND", "not done, not marked", kNoAssignments));
+    EXPECT_EQ(0U, handedOut(outcome.calls));
+  }
+  for (const Operation& run : instanceOperations()) {
+    EXPECT_THAT(endOf(run()), ElementsAre("CMPI_RC_OK", "done, marked", kNoAssignments));
+  }
+}
+
+TEST_F(OrderedComponent, NullEnumerationWithSuccessIsAnEmptyOne) {
+  installOne();
+  broker.serve(kIpAssignmentClass).nullEnumeration = true;
+  for (const Operation& run : allThatEnumerate()) {
+    const Outcome outcome = run();
+    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
+    EXPECT_EQ(0U, handedOut(outcome.calls));
+  }
+}
+
+TEST_F(OrderedComponent, ExceptionOfTheEnumerationPasses) {
+  installOne();
+  broker.serve(kIpAssignmentClass).throws = true;
+  for (const Operation& run : allThatEnumerate()) EXPECT_THROW(run(), InjectedFailure);
+}
+
+TEST_F(OrderedComponent, EnumerationThatEndsHalfWayLeavesWhatWentOutAndItsCode) {
+  installTwo();
+  for (const Operation& run : allFrom(kSetting)) {
+    const Outcome outcome = failing("hasNext", Mode::RcAndNull, run, 3);
+    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_ERR_FAILED", "done, marked"));
+    EXPECT_EQ(1U, handedOut(outcome.calls));
+  }
+  for (const Operation& run : enumerations()) {
+    const Outcome outcome = failing("hasNext", Mode::RcAndNull, run, 3);
+    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
+    EXPECT_EQ(2U, handedOut(outcome.calls));
+  }
+}
+
+TEST_F(OrderedComponent, AssignmentThatTheEnumerationCannotGiveHasTheEmptyText) {
+  installTwo();
+  for (const Operation& run : allFrom(kSetting)) {
+    const Outcome outcome = failing("getNext", Mode::RcAndNull, run, 3);
+    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_ERR_FAILED", "not done, not marked", kMalformed));
+    EXPECT_EQ(1U, handedOut(outcome.calls));
+  }
+  for (const Operation& run : enumerations()) {
+    const Outcome outcome = failing("getNext", Mode::RcAndNull, run, 3);
+    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
+    EXPECT_EQ(2U, handedOut(outcome.calls));
+  }
+}
+
+}  // namespace
+}  // namespace ZV::Test
