@@ -5,8 +5,12 @@
 #include <stdlib.h>
 #include <sys/utsname.h>
 
+#include <array>
 #include <atomic>
+#include <cstdio>
 #include <filesystem>
+#include <memory>
+#include <regex>
 #include <stdexcept>
 #include <thread>
 
@@ -190,18 +194,44 @@ TEST_F(AgentTest, AForkWaitsUntilNoThreadIsInsideSoThatTheChildCanGoOn) {
 // The shared library, as a CIM server loads it.
 std::string library() { return ZORVA_LIB_DIR "/libzorvagent.so.1"; }
 
+std::size_t openDescriptors() {
+  std::size_t count = 0;
+  for ([[maybe_unused]] const auto& entry : std::filesystem::directory_iterator("/proc/self/fd")) ++count;
+  return count;
+}
+
 TEST(AgentLibrary, IsLoadedAndUnloadedAHundredTimesAndReallyGone) {
+  const std::size_t before = openDescriptors();
   for (int i = 0; i < 100; ++i) {
     void* handle = ::dlopen(library().c_str(), RTLD_NOW | RTLD_LOCAL);
     ASSERT_NE(handle, nullptr) << ::dlerror();
-    using GetDataDir = const char* (*)();
-    const auto getDataDir =
-        reinterpret_cast<GetDataDir>(::dlsym(handle, "_ZN2ZV17PlatformUtilities17getMaroviaDataDirEv"));
-    ASSERT_NE(getDataDir, nullptr);
-    EXPECT_NE(getDataDir(), nullptr) << "the process's state is made, and must go with the library";
+    using CurrentTree = std::shared_ptr<const TreeSnapshot> (*)();
+    const auto readTree = reinterpret_cast<CurrentTree>(::dlsym(handle, "_ZN9zorvagent11currentTreeEv"));
+    ASSERT_NE(readTree, nullptr);
+    EXPECT_NE(readTree(), nullptr) << "sockets, watches and the process's state are made, and must go with the library";
     ASSERT_EQ(::dlclose(handle), 0);
     ASSERT_EQ(::dlopen(library().c_str(), RTLD_NOW | RTLD_NOLOAD), nullptr) << "it is still there";
   }
+  EXPECT_EQ(openDescriptors(), before);
+}
+
+// The lines that a command prints.
+std::vector<std::string> linesOf(const std::string& command) {
+  std::vector<std::string> lines;
+  FILE* pipe = ::popen(command.c_str(), "r");
+  std::array<char, 4096> line;
+  while (pipe != nullptr && std::fgets(line.data(), static_cast<int>(line.size()), pipe) != nullptr) {
+    lines.emplace_back(line.data());
+  }
+  if (pipe != nullptr) ::pclose(pipe);
+  return lines;
+}
+
+TEST(AgentLibrary, ExportsItsInterfacesAndNothingElse) {
+  const auto symbols = linesOf("nm -DC --defined-only '" + library() + "'");
+  EXPECT_GT(symbols.size(), 50U);
+  const std::regex own("[0-9a-f]+ [A-Z] ((typeinfo|typeinfo name|vtable) for )?(ZV|ZALog|zorvagent)::.*\n");
+  for (const std::string& symbol : symbols) EXPECT_TRUE(std::regex_match(symbol, own)) << symbol;
 }
 
 TEST(AgentLibrary, AForkAfterItIsUnloadedWorks) {

@@ -1,35 +1,33 @@
 #include "broker/Arena.h"
 
-#include <algorithm>
 #include <cstdlib>
 #include <cstring>
 
+#include "broker/BlockCache.h"
 #include "broker/ClassTable.h"
 #include "broker/Objects.h"
 
 namespace zorva::broker {
 
-namespace {
-
-constexpr std::size_t kHeader = 16;  // of a block; keeps what follows aligned
-
-}  // namespace
-
 Arena::~Arena() {
   while (blocks_ != nullptr) {
-    Block* block = blocks_;
+    MemoryBlock* block = blocks_;
     blocks_ = block->previous;
-    std::free(block);
+    if (cache_ == nullptr || !cache_->keep(block)) std::free(block);
   }
 }
 
 char* Arena::addBlock(std::size_t size) {
-  auto* block = static_cast<Block*>(std::malloc(kHeader + size));
-  if (block == nullptr) throw std::bad_alloc();
+  MemoryBlock* block = cache_ != nullptr && size == BlockCache::kBlock ? cache_->take() : nullptr;
+  if (block == nullptr) {
+    block = static_cast<MemoryBlock*>(std::malloc(sizeof(MemoryBlock) + size));
+    if (block == nullptr) throw std::bad_alloc();
+    block->size = size;
+  }
   block->previous = blocks_;
   blocks_ = block;
-  size_ += kHeader + size;
-  return reinterpret_cast<char*>(block) + kHeader;
+  size_ += sizeof(MemoryBlock) + size;
+  return reinterpret_cast<char*>(block + 1);
 }
 
 void* Arena::takeFromNewBlock(std::size_t size) {
@@ -38,7 +36,8 @@ void* Arena::takeFromNewBlock(std::size_t size) {
   if (size > next_ / 2) return addBlock(size);
   position_ = addBlock(next_);
   end_ = position_ + next_;
-  next_ = std::min(next_ * 2, kLargestBlock);
+  // Small requests stay small; from then on blocks are of the size that the cache keeps.
+  next_ = next_ * 4 < BlockCache::kBlock ? next_ * 4 : BlockCache::kBlock;
   return take(size);
 }
 

@@ -14,8 +14,10 @@
 
 namespace zorva::broker {
 
+class BlockCache;
 class ClassInfo;
 class ClassTable;
+struct MemoryBlock;
 struct StringObject;
 
 class Arena {
@@ -37,14 +39,14 @@ class Arena {
 
   template <class T, class... Args>
   T* make(Args&&... args) {
-    static_assert(std::is_trivially_destructible_v<T> && alignof(T) <= alignof(std::max_align_t));
+    static_assert(std::is_trivially_destructible_v<T> && alignof(T) <= kAlignment);
     return new (allocate(sizeof(T))) T(std::forward<Args>(args)...);
   }
 
   /// `count` values of T, value-initialised.
   template <class T>
   T* makeArray(std::size_t count) {
-    static_assert(std::is_trivially_destructible_v<T> && alignof(T) <= alignof(std::max_align_t));
+    static_assert(std::is_trivially_destructible_v<T> && alignof(T) <= kAlignment);
     if (count > kMost / sizeof(T)) throw std::bad_alloc();
     return new (allocate(count == 0 ? 1 : count * sizeof(T))) T[count == 0 ? 1 : count]();
   }
@@ -72,16 +74,13 @@ class Arena {
   std::size_t size() const noexcept { return size_; }
 
  private:
-  struct Block {
-    Block* previous;
-  };
+  static constexpr std::size_t kAlignment = 8;
   // No object of a request is larger: what asks for more is mistaken, and the machine should not try to please it.
   static constexpr std::size_t kMost = static_cast<std::size_t>(1) << 30;
-  static constexpr std::size_t kLargestBlock = 256 * 1024;
   static constexpr unsigned kRemembered = 4;
 
   void* take(std::size_t size) {
-    const std::size_t rounded = (size + 15) & ~static_cast<std::size_t>(15);
+    const std::size_t rounded = (size + kAlignment - 1) & ~(kAlignment - 1);
     if (rounded > static_cast<std::size_t>(end_ - position_)) return takeFromNewBlock(rounded);
     void* memory = position_;
     position_ += rounded;
@@ -92,10 +91,11 @@ class Arena {
   char* addBlock(std::size_t size);
 
   const ClassTable* classes_;
+  BlockCache* cache_;
   std::size_t next_;  // of the next block
   char* position_ = nullptr;
   char* end_ = nullptr;
-  Block* blocks_ = nullptr;
+  MemoryBlock* blocks_ = nullptr;
   std::size_t size_ = 0;
   const void* root_ = nullptr;
   bool shared_ = false;

@@ -6,6 +6,7 @@
 #include <string_view>
 #include <vector>
 
+#include "broker/BlockCache.h"
 #include "broker/Broker.h"
 #include "broker/ClassTable.h"
 #include "broker/ProviderLoader.h"
@@ -33,6 +34,7 @@ class BrokerCore {
   const ClassTable& classes() const noexcept { return classes_; }
   const ProviderRegistry& registry() const noexcept { return registry_; }
   ProviderLoader& loader() noexcept { return loader_; }
+  BlockCache& blocks() noexcept { return blocks_; }
 
   /// Hands a line to the log hook. What the hook throws is lost.
   void log(LogLevel level, std::string_view text) const noexcept;
@@ -51,6 +53,7 @@ class BrokerCore {
 
   CMPIBroker handle_;
   ClassTable classes_;
+  BlockCache blocks_;
   ProviderRegistry registry_;
   LogHook log_;
   std::mutex threadsMutex_;  // guards the two that follow

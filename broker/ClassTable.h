@@ -1,5 +1,6 @@
 #pragma once
 
+#include <atomic>
 #include <cstdint>
 #include <deque>
 #include <memory>
@@ -33,6 +34,12 @@ class ClassInfo {
   /// Null where the class has no such property; the name in any case.
   const PropertyInfo* find(std::string_view name) const noexcept;
 
+  /// How many properties the fullest instance so far had: room for as many is taken at once.
+  std::uint32_t usualSize() const noexcept { return usualSize_.load(std::memory_order_relaxed); }
+  void noteSize(std::uint32_t size) const noexcept {
+    if (size > usualSize()) usualSize_.store(size, std::memory_order_relaxed);
+  }
+
   bool isA(const ClassInfo& ancestor) const noexcept { return declared_.isA(ancestor.declared_); }
 
  private:
@@ -43,6 +50,7 @@ class ClassInfo {
   std::vector<const PropertyInfo*> keys_;
   // Open addressing: index + 1 of the property whose name hashes here, 0 for none. At most half full.
   std::vector<std::uint16_t> buckets_;
+  mutable std::atomic<std::uint32_t> usualSize_ = 0;
 };
 
 /// All classes of a broker. Safe on any thread.

@@ -214,7 +214,11 @@ PathObject* copyPath(Arena& arena, const PathObject& path) {
   copy->nameSpace = copyName(arena, *path.nameSpace);
   copy->host = copyName(arena, *path.host);
   copy->className = copyString(arena, *path.className);
-  copyEntries(arena, path.keys, copy->keys);
+  if (path.arena == &arena) {
+    copy->keys.share(path.keys);
+  } else {
+    copyEntries(arena, path.keys, copy->keys);
+  }
   return copy;
 }
 

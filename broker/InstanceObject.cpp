@@ -156,14 +156,14 @@ void InstanceObject::set(const PropertyInfo& property, const CMPIData& data) {
     return;
   }
   if (count == capacity) {
-    // Associations have two or three properties, others a dozen or two.
-    const std::uint32_t grown = capacity == 0 ? 4 : capacity * 3;
+    const std::uint32_t grown = capacity == 0 ? std::max(4U, info->usualSize()) : capacity * 2;
     auto* more = arena->makeArray<Slot>(grown);
     std::copy(slots, slots + count, more);
     slots = more;
     capacity = grown;
   }
   slots[count++] = {&property, data};
+  info->noteSize(count);
 }
 
 PathObject* InstanceObject::path(Arena& into) const {

@@ -102,6 +102,9 @@ class EntryList {
   };
 
   const Entry* find(std::string_view name) const noexcept;
+  /// Takes over the entries of a list of the same arena without copying them; whichever list is changed first gets
+  /// entries of its own.
+  void share(const EntryList& other) noexcept;
   /// Sets the entry of that name, or appends one.
   void set(Arena& arena, StringObject* name, const CMPIData& data);
   void append(Arena& arena, StringObject* name, const CMPIData& data);
@@ -113,9 +116,13 @@ class EntryList {
   const Entry* end() const noexcept { return entries_ + size_; }
 
  private:
+  /// Gives the list an array of its own.
+  void moveTo(Arena& arena, std::uint32_t capacity);
+
   Entry* entries_ = nullptr;
   std::uint32_t size_ = 0;
   std::uint32_t capacity_ = 0;
+  mutable bool shared_ = false;  // another list may have the same entries
 };
 
 struct PathObject : CMPIObjectPath {

@@ -51,8 +51,9 @@ ProviderLoader::ProviderLoader(BrokerCore& core, const ProviderRegistry& registr
 
 ProviderLoader::~ProviderLoader() {
   for (const auto& provider : providers_) {
-    const bool stays = cleanUp(*provider, &Provider::instance) | cleanUp(*provider, &Provider::association) |
-                       cleanUp(*provider, &Provider::method);
+    bool stays = cleanUp(*provider, &Provider::instance);
+    stays = cleanUp(*provider, &Provider::association) || stays;
+    stays = cleanUp(*provider, &Provider::method) || stays;
     if (stays) libraries_.at(provider->library)->stays = true;
   }
 }

@@ -9,6 +9,9 @@ namespace zorva::broker {
 
 namespace {
 
+// What a request for one instance needs.
+constexpr std::size_t kFirstBlock = 4096;
+
 thread_local Scope* innermost = nullptr;
 
 }  // namespace
@@ -17,7 +20,7 @@ Scope::Scope(BrokerCore& core)
     : core_(core),
       parent_(innermost),
       depth_(innermost != nullptr ? innermost->depth_ + 1 : 1),
-      arena_(&core.classes()) {
+      arena_(&core.classes(), kFirstBlock, &core.blocks()) {
   innermost = this;
 }
 
@@ -34,7 +37,7 @@ void Scope::share() noexcept {
 }
 
 const void* Scope::mark() {
-  marks_.push_back(std::make_unique<Arena>(&core_.classes()));
+  marks_.push_back(std::make_unique<Arena>(&core_.classes(), kFirstBlock, &core_.blocks()));
   if (arena_.isShared()) marks_.back()->share();
   return marks_.back().get();
 }

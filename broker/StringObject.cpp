@@ -1,3 +1,6 @@
+#include <cstring>
+#include <new>
+
 #include "broker/Data.h"
 #include "broker/Objects.h"
 #include "broker/Scope.h"
@@ -26,7 +29,12 @@ CMPIStringFT StringObject::table = {
 };
 
 StringObject* StringObject::make(Arena& arena, std::string_view text) {
-  return arena.make<StringObject>(&arena, std::string_view(arena.text(text), text.size()));
+  // Object and characters in one piece.
+  auto* memory = static_cast<char*>(arena.allocate(sizeof(StringObject) + text.size() + 1));
+  char* chars = memory + sizeof(StringObject);
+  if (!text.empty()) std::memcpy(chars, text.data(), text.size());
+  chars[text.size()] = '\0';
+  return new (memory) StringObject(&arena, std::string_view(chars, text.size()));
 }
 
 StringObject& emptyString() noexcept {

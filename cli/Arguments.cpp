@@ -15,10 +15,12 @@ namespace {
 
 constexpr const char* kExamples = R"(
 Examples:
-  zorvactl show
-  zorvactl tree --output json
-  zorvactl ei ZORVA_DNSProtocolEndPoint --output json
-  zorvactl get 'ZORVA_DNSProtocolEndPoint.Name="eth0"'
+  zorvactl show                                          all at a glance
+  zorvactl ei ZORVA_DNSProtocolEndPoint --output json    the DNS client of each interface
+  zorvactl get 'ZORVA_DNSProtocolEndPoint.Name="eth0"'   one of them
+  zorvactl ai 'ZORVA_DNSProtocolEndPoint.Name="eth0"' --result-class CIM_RemoteServiceAccessPoint
+  zorvactl ifcfg init eth0                               give eth0 a file of settings
+  zorvactl dns set eth0 192.0.2.53 2001:db8::53          and change them
 
 A path may leave out keys where the rest is clear, and take any spelling of names. Exit status: 0 done, 1 the operation
 failed, 2 wrong usage or configuration.)";
@@ -57,7 +59,9 @@ class CommandLine {
 CommandLine::CommandLine() {
   app_.require_subcommand(1);
   app_.fallthrough();
-  app_.footer(kExamples);
+  // What subcommands have at the end of their help: they take over what stands here when they are added.
+  app_.footer(
+      "\nThe options of zorvactl itself may stand here as well: --output, --config, --log-level, --provider-dir.");
   app_.set_version_flag("--version", std::string("zorvactl ") + ZORVA_VERSION);
   addGlobalOptions();
   addOverviews();
@@ -67,6 +71,7 @@ CommandLine::CommandLine() {
   addSettings();
   addOverlay();
   addCompletion();
+  app_.footer(kExamples);
 }
 
 CLI::App* CommandLine::add(CLI::App& parent, const std::string& name, const std::string& description,

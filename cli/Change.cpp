@@ -26,12 +26,12 @@ struct FileSetting {
 };
 
 constexpr FileSetting kFileSettings[] = {
-    {"ZORVA_DNSSettingData", "RequestedHostname", "HOSTNAME"},
-    {"ZORVA_DNSSettingData", "DomainName", "DOMAINNAME"},
-    {"ZORVA_DNSSettingData", "DNSServerAddresses", "DNSSERVERS"},
-    {"ZORVA_DNSSettingData", "ConfigurationName", "CONFIG_NAME"},
-    {"ZORVA_DNSGeneralSettingData", "DNSSuffixesToAppend", "DNSSUFFIXES"},
-    {"ZORVA_DNSGeneralSettingData", "ConfigurationName", "CONFIG_NAME"},
+    {kSettingClass, "RequestedHostname", "HOSTNAME"},
+    {kSettingClass, "DomainName", "DOMAINNAME"},
+    {kSettingClass, "DNSServerAddresses", "DNSSERVERS"},
+    {kSettingClass, "ConfigurationName", "CONFIG_NAME"},
+    {kGeneralSettingClass, "DNSSuffixesToAppend", "DNSSUFFIXES"},
+    {kGeneralSettingClass, "ConfigurationName", "CONFIG_NAME"},
 };
 
 const FileSetting* fileSetting(const broker::Instance& instance, std::string_view property) {
@@ -74,7 +74,7 @@ std::vector<std::string> foreseenProblems(const Session& session, const broker::
   for (std::size_t i = 0; i < changes.size(); ++i) {
     const FileSetting* setting = fileSetting(instance, changes[i].name);
     if (setting == nullptr) continue;
-    const bool isGeneral = instance.path.className == "ZORVA_DNSGeneralSettingData";
+    const bool isGeneral = instance.path.className == kGeneralSettingClass;
     const std::string interface =
         isGeneral ? interfaceOfHostSettings(session).value_or("") : interfaceOfSetting(instance);
     if (interface.empty()) {
@@ -92,7 +92,7 @@ std::string unforeseenProblem(const broker::Instance& instance, const broker::Pr
   if (fileSetting(instance, change.name) != nullptr) {
     return "the file cannot be written, or does not hold the value as it was given";
   }
-  if (instance.path.className == "ZORVA_DNSProtocolEndPoint" &&
+  if (instance.path.className == kEndpointClass &&
       (change.name == "DNSSuffixesToAppend" || change.name == "DomainName" || change.name == "Hostname")) {
     return "the agent could not store it in " + printable(zorvagent::dataDirectory()) + "; is that there and writable?";
   }
@@ -104,12 +104,14 @@ broker::Instance instanceToSend(const broker::Instance& found, const std::vector
   broker::Instance sent;
   sent.path = found.path;
   sent.declaration = found.declaration;
-  const auto isChanged = [&changes](const broker::Property& property) {
-    return std::any_of(changes.begin(), changes.end(),
-                       [&](const broker::Property& change) { return schema::sameName(change.name, property.name); });
-  };
+  // What the endpoint's provider gets is stored, also an empty text where the host says nothing; that would hide what
+  // the host says later.
+  const bool storesAll = found.path.className == kEndpointClass;
   for (const broker::Property& property : found.properties) {
-    if (!only && !isChanged(property) && !isEmpty(property.value)) sent.properties.push_back(property);
+    const bool isChanged = std::any_of(changes.begin(), changes.end(), [&](const broker::Property& change) {
+      return schema::sameName(change.name, property.name);
+    });
+    if (!only && !isChanged && !(storesAll && isEmpty(property.value))) sent.properties.push_back(property);
   }
   sent.properties.insert(sent.properties.end(), changes.begin(), changes.end());
   return sent;
@@ -166,14 +168,16 @@ void writeChanges(const Session& session, const broker::Instance& instance,
                   const std::vector<broker::Property>& changes, const ChangeOptions& options) {
   write(std::string(options.dryRun ? "would send " : "") + printable(shortPathText(instance.path)) + "\n");
   Table table({}, 2);
-  const auto add = [&table](const broker::Property& property, Style style) {
-    table.add({Cell(property.name, style), valueText(property.value, property.declaration)});
-  };
-  for (const broker::Property& property : instance.properties) {
-    const bool isChanged = std::any_of(changes.begin(), changes.end(), [&](const broker::Property& change) {
-      return schema::sameName(change.name, property.name);
-    });
-    if (isChanged || options.dryRun) add(property, isChanged ? Style::Heading : Style::Plain);
+  if (options.dryRun) {
+    for (const broker::Property& property : instance.properties) {
+      table.add({property.name, valueText(property.value, property.declaration)});
+    }
+  } else {
+    // An empty list is not among the properties that come back.
+    for (const broker::Property& change : changes) {
+      const broker::Value* value = instance.property(change.name);
+      table.add({change.name, value == nullptr ? "" : valueText(*value, change.declaration)});
+    }
   }
   write(table.text(session.layout()));
 }

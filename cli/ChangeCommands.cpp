@@ -5,6 +5,7 @@
 #include "cli/Change.h"
 #include "cli/Commands.h"
 #include "cli/Failure.h"
+#include "cli/HostView.h"
 #include "cli/JsonOutput.h"
 #include "cli/Paths.h"
 #include "cli/ResultWriter.h"
@@ -95,7 +96,7 @@ void invokeMethod(const Arguments& arguments) {
               session.broker().invokeMethod(path, method.name, input, result));
   write(arguments.output == OutputFormat::Json ? methodResultJson(result) + "\n"
                                                : methodTable(result, session.layout()));
-  if (path.className == "ZORVA_DNSProtocolEndPoint") {
+  if (path.className == kEndpointClass) {
     tellNote(method.name +
              " checks and answers, and changes nothing; 'zorvactl dns', 'domain', 'suffixes' and 'modify' do");
   }

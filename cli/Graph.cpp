@@ -51,7 +51,7 @@ class Walk {
   }
 
   std::string problemOf(const broker::ObjectPath& path) {
-    if (path.keys.empty()) return "the reference has no keys, so it names no object";
+    if (path.keys.empty()) return "its provider gives this end without keys, by design";
     broker::Instance instance;
     broker::Selection keysOnly;
     keysOnly.propertyList.emplace();
@@ -92,42 +92,72 @@ class Walk {
   std::deque<std::size_t> open_;
 };
 
-/// The lines of a tree: an object, under it its associations, each with its far end.
+/// The lines of a tree: an object, under it its associations, each with its far end. An object stands under the one
+/// from which the fewest steps lead to it.
 class TreeWriter {
  public:
   TreeWriter(const Graph& graph, const Layout& layout)
       : graph_(graph),
         layout_(layout),
         links_(graph.objects.size()),
+        wayTo_(graph.objects.size(), kNone),
         written_(graph.objects.size()),
         told_(graph.associations.size()) {
     for (std::size_t i = 0; i < graph.associations.size(); ++i) {
-      links_[graph.associations[i].from.object].push_back(i);
-      if (graph.associations[i].to.object != graph.associations[i].from.object) {
-        links_[graph.associations[i].to.object].push_back(i);
-      }
+      const GraphAssociation& each = graph.associations[i];
+      links_[each.from.object].push_back(i);
+      if (each.to.object != each.from.object) links_[each.to.object].push_back(i);
     }
   }
 
   std::string text() {
-    for (std::size_t object = 0; object < graph_.objects.size(); ++object) {
-      if (written_[object] || !graph_.objects[object].problem.empty()) continue;
-      writeTree(object);
-    }
+    const std::vector<std::size_t> roots = findWays();
+    for (const std::size_t root : roots) writeTree(root);
     return std::move(out_);
   }
 
  private:
   struct Step {
     std::size_t object;
-    std::size_t depth;
     std::size_t nextLink;
   };
+  static constexpr std::size_t kNone = static_cast<std::size_t>(-1);
+  static constexpr std::size_t kDeepestIndent = 30;
+
+  bool isThere(std::size_t object) const { return graph_.objects[object].problem.empty(); }
+
+  const GraphEnd& farEnd(std::size_t link, std::size_t object) const {
+    const GraphAssociation& association = graph_.associations[link];
+    return association.from.object == object ? association.to : association.from;
+  }
+
+  /// For each object the link that leads to it first; gives the objects to which none does.
+  std::vector<std::size_t> findWays() {
+    std::vector<std::size_t> roots;
+    std::vector<bool> reached(graph_.objects.size());
+    for (std::size_t root = 0; root < graph_.objects.size(); ++root) {
+      if (reached[root] || !isThere(root)) continue;
+      reached[root] = true;
+      roots.push_back(root);
+      std::deque<std::size_t> open{root};
+      for (; !open.empty(); open.pop_front()) {
+        for (const std::size_t link : links_[open.front()]) {
+          const std::size_t far = farEnd(link, open.front()).object;
+          if (reached[far] || !isThere(far)) continue;
+          reached[far] = true;
+          wayTo_[far] = link;
+          open.push_back(far);
+        }
+      }
+    }
+    return roots;
+  }
 
   // A stack of its own: the tree may be as deep as the host has objects.
   void writeTree(std::size_t root) {
-    writeObject(root, styled(printable(shortPathText(graph_.objects[root].path)), Style::Heading, layout_), 0);
-    std::vector<Step> stack{{root, 0, 0}};
+    written_[root] = true;
+    out_ += styled(printable(shortPathText(graph_.objects[root].path)), Style::Heading, layout_) + "\n";
+    std::vector<Step> stack{{root, 0}};
     while (!stack.empty()) {
       Step& step = stack.back();
       if (step.nextLink == links_[step.object].size()) {
@@ -137,38 +167,31 @@ class TreeWriter {
       const std::size_t link = links_[step.object][step.nextLink++];
       if (told_[link]) continue;
       told_[link] = true;
-      const GraphAssociation& association = graph_.associations[link];
-      const GraphEnd& far = association.from.object == step.object ? association.to : association.from;
-      const std::size_t depth = step.depth + 1;
-      if (writeFarEnd(association, far, depth)) stack.push_back({far.object, depth, 0});
+      const GraphEnd& far = farEnd(link, step.object);
+      writeFarEnd(link, far, stack.size());
+      if (wayTo_[far.object] == link) stack.push_back({far.object, 0});
     }
   }
 
-  /// True where the far end is written for the first time, so that its own associations follow.
-  bool writeFarEnd(const GraphAssociation& association, const GraphEnd& far, std::size_t depth) {
-    const GraphObject& object = graph_.objects[far.object];
-    std::string line = association.className + " " + styled("-> " + far.role, Style::Faint, layout_) + "  ";
-    if (!object.problem.empty()) {
-      line += styled(objectLabel(object.path) + " (cannot be fetched)", Style::Bad, layout_);
+  void writeFarEnd(std::size_t link, const GraphEnd& far, std::size_t depth) {
+    const std::string label = objectLabel(graph_.objects[far.object].path);
+    out_.append(2 * std::min(depth, kDeepestIndent), ' ');
+    out_ += graph_.associations[link].className + styled(" -> " + far.role + "  ", Style::Faint, layout_);
+    if (!isThere(far.object)) {
+      out_ += styled(label + " (cannot be fetched)", Style::Bad, layout_);
+    } else if (wayTo_[far.object] == link) {
+      out_ += styled(label, Style::Heading, layout_);
     } else {
-      line += styled(objectLabel(object.path), Style::Heading, layout_) + (written_[far.object] ? " (above)" : "");
+      out_ += label + (written_[far.object] ? " (above)" : " (below)");
     }
-    const bool isFirst = object.problem.empty() && !written_[far.object];
-    writeObject(far.object, line, depth);
-    return isFirst;
+    out_ += "\n";
+    written_[far.object] = written_[far.object] || wayTo_[far.object] == link;
   }
-
-  void writeObject(std::size_t object, const std::string& line, std::size_t depth) {
-    written_[object] = true;
-    out_.append(2 * std::min<std::size_t>(depth, kDeepestIndent), ' ');
-    out_ += line + "\n";
-  }
-
-  static constexpr std::size_t kDeepestIndent = 30;
 
   const Graph& graph_;
   Layout layout_;
-  std::vector<std::vector<std::size_t>> links_;
+  std::vector<std::vector<std::size_t>> links_;  // of each object
+  std::vector<std::size_t> wayTo_;               // kNone for roots and for what cannot be fetched
   std::vector<bool> written_;
   std::vector<bool> told_;
   std::string out_;

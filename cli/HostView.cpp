@@ -12,11 +12,6 @@ namespace zorva::cli {
 
 namespace {
 
-constexpr const char* kEndpointClass = "ZORVA_DNSProtocolEndPoint";
-constexpr const char* kServerClass = "ZORVA_RemoteServiceAccessPoint";
-constexpr const char* kSettingClass = "ZORVA_DNSSettingData";
-constexpr const char* kGeneralSettingClass = "ZORVA_DNSGeneralSettingData";
-
 std::optional<std::uint64_t> numberOf(const broker::Instance& instance, std::string_view property) {
   const broker::Value* value = instance.property(property);
   if (value == nullptr || value->isNull) return std::nullopt;

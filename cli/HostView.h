@@ -11,6 +11,11 @@
 
 namespace zorva::cli {
 
+inline constexpr const char* kEndpointClass = "ZORVA_DNSProtocolEndPoint";
+inline constexpr const char* kServerClass = "ZORVA_RemoteServiceAccessPoint";
+inline constexpr const char* kSettingClass = "ZORVA_DNSSettingData";
+inline constexpr const char* kGeneralSettingClass = "ZORVA_DNSGeneralSettingData";
+
 /// Where the value of a setting comes from: the interface's file, the host, or nowhere.
 enum class SettingSource { File, Host, None };
 

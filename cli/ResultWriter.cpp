@@ -117,6 +117,10 @@ std::unique_ptr<ResultWriter> makeResultWriter(OutputFormat format, const Layout
       return std::make_unique<TableWriter>(layout);
     case OutputFormat::Json:
       return std::make_unique<JsonWriter>(count);
+    case OutputFormat::Mof:
+      return std::make_unique<MofWriter>();
+    case OutputFormat::Xml:
+      return std::make_unique<XmlWriter>();
     default:
       break;
   }

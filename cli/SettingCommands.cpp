@@ -26,7 +26,7 @@ constexpr const char* kSuffixes = "DNSSuffixesToAppend";
 /// The settings of an interface. Where the host and its service processor have one of the same name, the host's: both
 /// would be kept in the same file.
 broker::Instance settingOfInterface(Session& session, const std::string& interface) {
-  const std::vector<broker::Instance> all = instancesOf(session, "ZORVA_DNSSettingData");
+  const std::vector<broker::Instance> all = instancesOf(session, kSettingClass);
   const broker::Instance* found = nullptr;
   std::vector<std::string> names;
   for (const broker::Instance& instance : all) {
@@ -42,7 +42,7 @@ broker::Instance settingOfInterface(Session& session, const std::string& interfa
 }
 
 broker::Instance settingOfHost(Session& session) {
-  const std::vector<broker::Instance> all = instancesOf(session, "ZORVA_DNSGeneralSettingData");
+  const std::vector<broker::Instance> all = instancesOf(session, kGeneralSettingClass);
   if (!all.empty()) return all.front();
   throw Failure(ExitCode::Failed, "this host has no general DNS settings: it has no interface that could hold them");
 }

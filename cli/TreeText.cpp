@@ -93,7 +93,7 @@ std::string propertyLines(const Node& node, std::size_t indent, const Layout& la
     if (property == nullptr) continue;
     const std::string value = joined(valueTexts(property->value), ", ");
     if (property->overlaid) {
-      table.add({known.word, value, Cell("(set, not the host's own)", Style::Warning)});
+      table.add({known.word, Cell(value + "  (set; not the host's own)", Style::Warning)});
     } else {
       table.add({known.word, value});
     }

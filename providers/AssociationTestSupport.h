@@ -260,11 +260,13 @@ class AssociationTest : public ::testing::Test {
 
   std::string operation(const std::string& name) const { return under.stem + "_" + name; }
 
-  // The calls and the provider's own lines; those of what stands below it are left out.
+  // The calls and the provider's own lines, without those of what stands below it, and the code where there is one.
   Story storyOf(const Outcome& outcome) const {
     Outcome own = outcome;
     own.lines = outcome.lines.ofCategory(under.category);
-    return own.story();
+    Story story = own.story();
+    if (outcome.rc != CMPI_RC_OK) story.push_back(nameOf(outcome.rc));
+    return story;
   }
   // What the provider itself complains of.
   std::vector<std::string> complaintsOf(const Outcome& outcome) const {
@@ -368,7 +370,7 @@ class AssociationTest : public ::testing::Test {
     bool showsCode;    // whether the request then ends at once with the broker's code; or else completes without it
   };
 
-  // The other provider is missing, fails, gives nothing, gives objects without handles, or throws.
+  // The other provider is missing, fails, gives nothing, gives objects without handles, stops half way, or throws.
   void expectToEndAsTheOtherProviderHasIt(const std::string& otherClass, const std::vector<Instance>& objects,
                                           const std::vector<UpCall>& upCalls) {
     for (const UpCall& upCall : upCalls) {
@@ -392,7 +394,9 @@ class AssociationTest : public ::testing::Test {
 
       broker.serve(otherClass, objects);
       for (const Mode mode : kAllStatusModes) failing("getNext", mode, upCall.run);
-      failing("hasNext", Mode::ReturnNull, upCall.run);
+      const Outcome cutShort = failing("hasNext", Mode::RcAndNull, upCall.run);
+      EXPECT_THAT(complaintsOf(cutShort), ::testing::IsEmpty());
+      EXPECT_EQ(upCall.showsCode ? CMPI_RC_ERR_FAILED : CMPI_RC_OK, cutShort.rc);
 
       broker.serve(otherClass, objects).throws = true;
       EXPECT_THROW(upCall.run(), InjectedFailure);

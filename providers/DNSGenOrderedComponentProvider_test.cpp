@@ -122,6 +122,14 @@ TEST_F(GeneralOrderedComponent, NoKeyDecidesWhatBelongsTogether) {
   EXPECT_THAT(textsOf(associators(ipAssignmentPath("nobody")).instances(), "InstanceID"), ElementsAre("dnsgen1:host1"));
 }
 
+TEST_F(GeneralOrderedComponent, BuilderReadsTheKeysOfBothEndsForNothing) {
+  installOne();
+  for (const Operation& run : enumerations()) {
+    EXPECT_THAT(run().calls.only({"getKey"}),
+                ElementsAre(R"(OP3.getKey("InstanceID"))", R"(OP2.getKey("InstanceID"))"));
+  }
+}
+
 TEST_F(GeneralOrderedComponent, AssignmentStaysAsTheBrokerGaveIt) {
   world.host().nic("eth0").install();
   Instance served = objectOf(kAssignment);

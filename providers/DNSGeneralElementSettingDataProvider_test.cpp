@@ -146,7 +146,6 @@ TEST_F(GeneralElementSettingData, NamesGiveTheSettingsTheNamespaceAloneAndAreDon
                   {"returnObjectPath(OP4)", "returnDone()"},
                   exitMark(operation("EnumInstanceNames"))}),
             storyOf(names));
-  EXPECT_EQ(CMPI_RC_OK, names.rc);
 }
 
 TEST_F(GeneralElementSettingData, InstancesPlaceTheSettingsAndAreDoneBeforeTheyAreMarked) {
@@ -166,7 +165,6 @@ TEST_F(GeneralElementSettingData, InstancesPlaceTheSettingsAndAreDoneBeforeTheyA
                   {"returnInstance(I1)", "returnDone()"},
                   exitMark(operation("EnumInstances"))}),
             storyOf(all));
-  EXPECT_EQ(CMPI_RC_OK, all.rc);
 }
 
 TEST_F(GeneralElementSettingData, PropertyListNarrowsInstancesToItAndTheKeys) {
@@ -235,7 +233,6 @@ TEST_F(GeneralElementSettingData, InstanceOfAPairIsFoundAndDoneBeforeItIsMarked)
   const Story story = storyOf(got);
   EXPECT_EQ(tell({{"returnInstance(I2)", "returnDone()"}, exitMark(operation("GetInstance"))}),
             Story(story.end() - 4, story.end()));
-  EXPECT_EQ(CMPI_RC_OK, got.rc);
 }
 
 TEST_F(GeneralElementSettingData, PathThatNamesNoPairGivesAnEmptyCompletedResult) {
@@ -261,7 +258,6 @@ TEST_F(GeneralElementSettingData, AssociatorsOfTheSettingsAreAllSystemsWhateverT
                   {newPath(kSystem), "enumerateInstances(OP2)", "E1.getNext()", "returnInstance(I1)", "returnDone()"},
                   exitMark(operation("Associators"))}),
             storyOf(found));
-  EXPECT_EQ(CMPI_RC_OK, found.rc);
   EXPECT_EQ(
       tell({entry(operation("AssociatorNames")),
             newHostPath("OP1", kSystem),
@@ -281,7 +277,6 @@ TEST_F(GeneralElementSettingData, AssociatorsOfASystemAreTheSettingsAndTheirName
                   {"returnInstance(I1)", "returnDone()"},
                   exitMark(operation("Associators"))}),
             storyOf(found));
-  EXPECT_EQ(CMPI_RC_OK, found.rc);
   EXPECT_EQ(tell({entry(operation("AssociatorNames")),
                   newHostPath("OP1", kSetting),
                   newGeneralSettingPath("OP2"),
@@ -304,8 +299,8 @@ TEST_F(GeneralElementSettingData, ResultClassIsTakenByItsTwoNamesInAnyCaseAndByN
 TEST_F(GeneralElementSettingData, AssociatorsLeaveOpenOnEveryFailureAndShowItsCode) {
   install({"host1"});
   const Path setting = generalSettingPath();
-  for (const std::function<Outcome()>& run : std::initializer_list<std::function<Outcome()>>{
-           [&] { return associators(setting); }, [&] { return associatorNames(setting); }}) {
+  for (const std::function<Outcome()>& run :
+       {std::function([&] { return associators(setting); }), std::function([&] { return associatorNames(setting); })}) {
     EXPECT_THAT(endOf(failing(newPath(kSystem), Mode::RcAndNull, run, 1)),
                 ElementsAre("CMPI_RC_ERR_FAILED", "not done, not marked", "Object Path is NULL in Associators."));
     EXPECT_THAT(endOf(failing(newPath(kSystem), Mode::RcAndNull, run, 2)),
@@ -342,7 +337,6 @@ TEST_F(GeneralElementSettingData, ReferencesOfASystemPlaceTheSettings) {
                   {"returnInstance(I1)", "returnDone()"},
                   exitMark(operation("References"))}),
             storyOf(found));
-  EXPECT_EQ(CMPI_RC_OK, found.rc);
 }
 
 TEST_F(GeneralElementSettingData, ReferencesOfTheSettingsOnlyCountTheSystems) {
@@ -356,7 +350,6 @@ TEST_F(GeneralElementSettingData, ReferencesOfTheSettingsOnlyCountTheSystems) {
                   {"returnInstance(I1)", "returnDone()"},
                   exitMark(operation("References"))}),
             storyOf(found));
-  EXPECT_EQ(CMPI_RC_OK, found.rc);
 }
 
 TEST_F(GeneralElementSettingData, ReferenceNamesAreThePathsOfInstancesOnTheSourcesNamespaceWithoutAHost) {
@@ -373,7 +366,6 @@ TEST_F(GeneralElementSettingData, ReferenceNamesAreThePathsOfInstancesOnTheSourc
                   {"I1.getObjectPath()", R"(OP4.setNameSpace("root/cimv2"))", "returnObjectPath(OP4)", "returnDone()"},
                   exitMark(operation("ReferenceNames"))}),
             storyOf(names));
-  EXPECT_EQ(CMPI_RC_OK, names.rc);
   EXPECT_EQ(tell({entry(operation("ReferenceNames")),
                   newHostPath("OP1", kSystem),
                   {newPath(kAssociation), "enumerateInstanceNames(OP1)", "E1.getNext()", "newInstance(OP2)"},

@@ -179,7 +179,6 @@ TEST_F(HostedAccessPoint, NamesGiveTheEndpointTheNamespaceAloneAndAreDoneBeforeT
                   {"returnObjectPath(OP4)", "returnDone()"},
                   exitMark(operation("EnumInstanceNames"))}),
             storyOf(names));
-  EXPECT_EQ(CMPI_RC_OK, names.rc);
 }
 
 TEST_F(HostedAccessPoint, InstancesAreDoneBeforeTheyAreMarked) {
@@ -197,7 +196,6 @@ TEST_F(HostedAccessPoint, InstancesAreDoneBeforeTheyAreMarked) {
                   {"returnInstance(I1)", "returnDone()"},
                   exitMark(operation("EnumInstances"))}),
             storyOf(all));
-  EXPECT_EQ(CMPI_RC_OK, all.rc);
 }
 
 TEST_F(HostedAccessPoint, HostWithoutEndpointsLeavesNamesOpenAndEndsInstancesEmpty) {
@@ -268,7 +266,6 @@ TEST_F(HostedAccessPoint, InstanceOfAPairIsFoundAndDoneBeforeItIsMarked) {
   const Story story = storyOf(got);
   EXPECT_EQ(tell({{"returnInstance(I2)", "returnDone()"}, exitMark(operation("GetInstance"))}),
             Story(story.end() - 4, story.end()));
-  EXPECT_EQ(CMPI_RC_OK, got.rc);
 }
 
 TEST_F(HostedAccessPoint, PathThatNamesNoPairGivesAnEmptyCompletedResult) {
@@ -293,7 +290,6 @@ TEST_F(HostedAccessPoint, AssociatorsOfAnEndpointGoOutAsTheBrokerGaveThemWhateve
                   {"enumerateInstances(OP1)", "E1.getNext()", "I1.getObjectPath()", "returnInstance(I1)"},
                   exitMark(operation("Associators"))}),
             storyOf(found));
-  EXPECT_EQ(CMPI_RC_OK, found.rc);
   EXPECT_EQ(tell({entry(operation("AssociatorNames")),
                   newHostPath("OP1", kSystem),
                   {"enumerateInstanceNames(OP1)", "E1.getNext()", "returnObjectPath(OP2)"},
@@ -311,7 +307,6 @@ TEST_F(HostedAccessPoint, AssociatorsOfASystemAreTheEndpointsAndTheirNamesArePla
                   {"returnInstance(I1)"},
                   exitMark(operation("Associators"))}),
             storyOf(found));
-  EXPECT_EQ(CMPI_RC_OK, found.rc);
   EXPECT_EQ(tell({entry(operation("AssociatorNames")),
                   newHostPath("OP1", kEndpoint),
                   newEndpointPath("OP2", "eth0"),
@@ -362,7 +357,6 @@ TEST_F(HostedAccessPoint, ReferencesOfAnEndpointLeaveTheSystemUntouched) {
                   {"returnInstance(I1)"},
                   exitMark(operation("References"))}),
             storyOf(found));
-  EXPECT_EQ(CMPI_RC_OK, found.rc);
 }
 
 TEST_F(HostedAccessPoint, ReferencesOfASystemPlaceTheEndpoint) {
@@ -378,7 +372,6 @@ TEST_F(HostedAccessPoint, ReferencesOfASystemPlaceTheEndpoint) {
                   {"returnInstance(I1)"},
                   exitMark(operation("References"))}),
             storyOf(found));
-  EXPECT_EQ(CMPI_RC_OK, found.rc);
 }
 
 TEST_F(HostedAccessPoint, ReferenceNamesAreThePathsOfInstancesOnTheSourcesNamespaceAndThisHost) {
@@ -412,6 +405,19 @@ TEST_F(HostedAccessPoint, ReferencesOfASystemOnAHostWithoutEndpointsComplainInTh
   EXPECT_THAT(endOf(references(systemPath("host1"))), ElementsAre("CMPI_RC_OK", "not done, not marked", kNoReferences));
   EXPECT_THAT(endOf(referenceNames(systemPath("host1"))),
               ElementsAre("CMPI_RC_OK", "not done, not marked", kNoReferences));
+}
+
+TEST_F(HostedAccessPoint, EndpointsThatCouldNotBeFetchedLeaveTheirCode) {
+  install({"eth0"}, {});
+  const auto end = [this](const std::function<Outcome()>& run) {
+    return endOf(failing(newPath(kEndpoint), Mode::RcAndNull, run, 2));
+  };
+  EXPECT_THAT(end([this] { return associatorNames(systemPath("host1")); }),
+              ElementsAre("CMPI_RC_ERR_FAILED", "not done, not marked", kNoAssociatorNames));
+  EXPECT_THAT(end([this] { return references(systemPath("host1")); }),
+              ElementsAre("CMPI_RC_ERR_FAILED", "not done, not marked", kNoReferences));
+  EXPECT_THAT(end([this] { return referenceNames(systemPath("host1")); }),
+              ElementsAre("CMPI_RC_ERR_FAILED", "not done, not marked", kNoReferences));
 }
 
 TEST_F(HostedAccessPoint, ReferenceThatCouldNotBeMadeIsHandedOutAsItIs) {

@@ -262,11 +262,14 @@ TEST_F(DNSSettingDataProviderTest, AMissingFileCostsTheConfigurationNameAlone) {
   EXPECT_EQ(texts({"192.0.2.53"}), instance["DNSServerAddresses"]);
 }
 
-TEST_F(DNSSettingDataProviderTest, NamesAreCountedInSixteenBits) {
-  for (int i = 0; i < 65536 + 2; ++i) world_.nic(std::to_string(i));
-  world_.install();
-  broker_.keepsLines = false;
-  EXPECT_THAT(provider_.enumerateInstanceNames(kClass).paths(), SizeIs(2));
+TEST(DNSSettingDataProvider, CountsNamesInSixteenBits) {
+  World world;
+  for (int i = 0; i < 65536 + 2; ++i) world.nic(std::to_string(i));
+  world.install();
+  RecordingBroker broker;
+  broker.keepsLines = false;
+  InstanceProvider provider(DNSSettingDataProvider_Create_InstanceMI, broker);
+  EXPECT_THAT(provider.enumerateInstanceNames(kClass).paths(), SizeIs(2));
 }
 
 // --- failures

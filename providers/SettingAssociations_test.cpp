@@ -283,6 +283,36 @@ TEST_P(SettingAssociation, NamespaceIsThatOfTheSource) {
   }
 }
 
+TEST_P(SettingAssociation, NamespaceOfEnumerationsIsThatOfTheClass) {
+  const Path path = associationClass().in("root/other");
+  const Outcome names = instanceProvider.enumerateInstanceNames(path);
+  const Outcome instances = instanceProvider.enumerateInstances(path);
+  ASSERT_EQ(association.pairs, names.paths().size());
+  ASSERT_EQ(association.pairs, instances.instances().size());
+  for (const Path& one : names.paths()) {
+    EXPECT_EQ("root/other", one.nameSpace);
+    EXPECT_EQ("root/other", one[under.left].path().nameSpace);
+    EXPECT_EQ("root/other", one[under.right].path().nameSpace);
+  }
+  for (const Instance& one : instances.instances()) {
+    EXPECT_EQ("root/other", one.path.nameSpace);
+    EXPECT_EQ("root/other", one[under.left].path().nameSpace);
+    EXPECT_EQ("root/other", one[under.right].path().nameSpace);
+  }
+}
+
+TEST_P(SettingAssociation, ObjectsAreCountedInSixteenBits) {
+  FetchHook hook;
+  hook.generalSettingPaths = hook.settingPaths = [](std::vector<CMPIObjectPath*>& paths) {
+    paths.assign(65536 + 2, paths.at(0));
+    return 0;
+  };
+  const Path& source = association.left.path;
+  EXPECT_THAT(associatorNames(source).paths(), SizeIs(2));
+  EXPECT_THAT(references(source).instances(), SizeIs(2));
+  EXPECT_THAT(referenceNames(source).paths(), SizeIs(2));
+}
+
 // --- Enumerations and single instances
 
 TEST_P(SettingAssociation, EveryPairHasANameAndAnInstance) {

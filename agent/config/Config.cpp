@@ -124,7 +124,7 @@ void readTree(Config& config, const toml::table& document) {
   if (config.source != "host" && config.source != "file") tree.fail("source", "expected \"host\" or \"file\"");
   tree.take("file", config.treeFile);
   if (config.source == "file" && config.treeFile.empty()) {
-    tree.fail("file", "is needed where tree.source is \"file\"");
+    tree.fail("source", "\"file\" needs tree.file as well");
   }
   if (!config.treeFile.empty()) config.treeFile = absolutePath(config.file, config.treeFile);
   tree.take("include_loopback", config.includeLoopback);

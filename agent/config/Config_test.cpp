@@ -98,7 +98,7 @@ TEST_F(ConfigTest, AWrongTypeIsNamedWithItsLine) {
 
 TEST_F(ConfigTest, AWrongValueIsNamedWithItsLine) {
   EXPECT_EQ(wrong("[tree]\nsource = \"hots\"\n"), "agent.toml:2: tree.source: expected \"host\" or \"file\"");
-  EXPECT_EQ(wrong("[tree]\nsource = \"file\"\n"), "agent.toml: tree.file: is needed where tree.source is \"file\"");
+  EXPECT_EQ(wrong("[tree]\nsource = \"file\"\n"), "agent.toml:2: tree.source: \"file\" needs tree.file as well");
   EXPECT_EQ(wrong("[tree]\napply = \"both\"\n"), "agent.toml:2: tree.apply: expected \"overlay\" or \"host\"");
   EXPECT_EQ(wrong("[agent]\ndata_dir = \"\"\n"), "agent.toml:2: agent.data_dir: must not be empty");
   EXPECT_EQ(wrong("[agent]\ndata_dir = \"a\\u0000b\"\n"), "agent.toml:2: agent.data_dir: must not hold a NUL");

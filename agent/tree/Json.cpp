@@ -151,6 +151,9 @@ class Builder : public nlohmann::json_sax<nlohmann::json> {
     JsonValue& value = open_.empty() ? root_ : open_.back()->items.emplace_back();
     value.kind = kind;
     value.line = lines_.line();
+    if (++values_ > kMostJsonValues) {
+      throw ConfigError(name_, value.line, {}, "has more than " + std::to_string(kMostJsonValues) + " values");
+    }
     return value;
   }
 
@@ -175,6 +178,7 @@ class Builder : public nlohmann::json_sax<nlohmann::json> {
 
   const std::string& name_;
   LineCounter& lines_;
+  std::size_t values_ = 0;
   JsonValue root_;
   // The lists and objects that are open. A pointer into items stays good: only the innermost one grows.
   std::vector<JsonValue*> open_;

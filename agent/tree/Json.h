@@ -37,8 +37,11 @@ struct JsonValue {
   const JsonValue* find(std::string_view key) const;
 };
 
-// The largest document that is read, in bytes, and how deep lists and objects may stand in one another.
+// The largest document that is read, in bytes and in values, and how deep lists and objects may stand in one another.
+// Some thirty thousand interfaces fit; what a hostile document can make the agent use stays below a quarter of a
+// gigabyte.
 inline constexpr std::size_t kLargestJson = std::size_t{64} << 20;
+inline constexpr std::size_t kMostJsonValues = 1000000;
 inline constexpr std::size_t kDeepestJson = 32;
 
 // Reads a document; name is what errors call it. Throws ConfigError where it is not JSON, too large or too deep, or

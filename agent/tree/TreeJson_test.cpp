@@ -219,6 +219,12 @@ TEST(TreeJson, DeepDocumentsAreRefused) {
   EXPECT_EQ(wrong(deep), "tree.json:1: lists and objects stand more than 32 deep in one another");
 }
 
+TEST(TreeJson, ADocumentOfMillionsOfValuesIsRefused) {
+  std::string many = "[0";
+  for (int i = 0; i < 1000000; ++i) many += ",0";
+  EXPECT_EQ(wrong(many + "]"), "tree.json:1: has more than 1000000 values");
+}
+
 TEST(TreeJson, KeysOfHostileTextStayOnTheirLine) {
   EXPECT_EQ(wrong(R"({"a\nb\u001b[2J": 1})"), "tree.json:1: a\\nb\\x1b[2J: is not a known key");
 }
