@@ -23,8 +23,10 @@ struct StringObject;
 class Arena {
  public:
   /// `classes` is what objects in this arena ask about their class; it outlives the arena. Null only where neither a
-  /// path nor an instance will live here. The first block of memory has `firstBlock` bytes, later ones are larger.
-  explicit Arena(const ClassTable* classes, std::size_t firstBlock = 4096) : classes_(classes), next_(firstBlock) {}
+  /// path nor an instance will live here. The first block of memory has `firstBlock` bytes, later ones are larger;
+  /// `cache`, where there is one, gives and takes the largest.
+  explicit Arena(const ClassTable* classes, std::size_t firstBlock = 4096, BlockCache* cache = nullptr)
+      : classes_(classes), cache_(cache), next_(firstBlock) {}
   ~Arena();
   Arena(const Arena&) = delete;
   Arena& operator=(const Arena&) = delete;

@@ -1,5 +1,6 @@
 #include "broker/Data.h"
 
+#include <algorithm>
 #include <cstring>
 
 #include "broker/ClassTable.h"
@@ -200,6 +201,12 @@ void copyEntries(Arena& arena, const EntryList& from, EntryList& to) {
 
 namespace {
 
+/// True for data that nobody can change behind the back of what holds them: no object, or a text or date-time.
+bool isUnchanging(const EntryList::Entry& entry) noexcept {
+  const CMPIType type = entry.data.type;
+  return type != CMPI_ref && type != CMPI_instance && (type & CMPI_ARRAY) == 0;
+}
+
 /// Namespaces and hosts are the same in most objects: one text in the new arena serves them all.
 StringObject* copyName(Arena& arena, const StringObject& name) {
   if (name.arena == nullptr || name.arena == &arena) return const_cast<StringObject*>(&name);
@@ -214,7 +221,7 @@ PathObject* copyPath(Arena& arena, const PathObject& path) {
   copy->nameSpace = copyName(arena, *path.nameSpace);
   copy->host = copyName(arena, *path.host);
   copy->className = copyString(arena, *path.className);
-  if (path.arena == &arena) {
+  if (path.arena == &arena && std::all_of(path.keys.begin(), path.keys.end(), isUnchanging)) {
     copy->keys.share(path.keys);
   } else {
     copyEntries(arena, path.keys, copy->keys);

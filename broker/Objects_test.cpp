@@ -207,6 +207,23 @@ TEST_F(ObjectsTest, ValuesAreCopied) {
   EXPECT_EQ(shown(get(labelled, "Labels").value.array), "{NULL}");
 }
 
+TEST_F(ObjectsTest, ACopyOfAPathIsItsOwn) {
+  CMPIInstance* link = instance("T_ThingOther");
+  CMPIObjectPath* left = thing("before");
+  CMPIValue value;
+  value.ref = left;
+  link->ft->setProperty(link, "Left", &value, CMPI_ref);
+  CMPIObjectPath* inside = get(link, "Left").value.ref;
+  addKey(inside, "Name", "inside");
+  addKey(left, "Other", "more");
+  EXPECT_EQ(shown(left), "root/cimv2:T_Thing.Name=\"before\",Other=\"more\"");
+  CMPIObjectPath* name = link->ft->getObjectPath(link, nullptr);
+  CMPIObjectPath* farEnd = name->ft->getKey(name, "Left", nullptr).value.ref;
+  addKey(farEnd, "Name", "of the name");
+  EXPECT_EQ(shown(get(link, "Left").value.ref), "root/cimv2:T_Thing.Name=\"inside\"");
+  EXPECT_EQ(shown(farEnd), "root/cimv2:T_Thing.Name=\"of the name\"");
+}
+
 TEST_F(ObjectsTest, AnEmbeddedInstanceFitsWhereItIsDeclared) {
   CMPIInstance* inner = instance();
   set(inner, "Name", "inner");

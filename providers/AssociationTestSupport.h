@@ -209,7 +209,7 @@ class AssociationTest : public ::testing::Test {
         instanceProvider(under.createInstanceMI, broker),
         associationProvider(under.createAssociationMI, broker) {}
 
-  Path associationClass() const { return Path(under.className); }
+  Path associationClass() const { return Path(under.className, nameSpace); }
   Path pairOf(const Path& left, const Path& right) const {
     return associationClass().key(under.left, ref(left)).key(under.right, ref(right));
   }
@@ -353,8 +353,13 @@ class AssociationTest : public ::testing::Test {
     }
   }
 
-  // The arguments that no association operation reads make no difference to anything.
+  // The arguments that no association operation reads, and the host of the source, make no difference to anything.
   void expectUnreadArgumentsIgnored(const Path& source) {
+    const Path elsewhere = source.on("elsewhere");
+    EXPECT_EQ(storyOf(associators(source)), storyOf(associators(elsewhere)));
+    EXPECT_EQ(storyOf(associatorNames(source)), storyOf(associatorNames(elsewhere)));
+    EXPECT_EQ(storyOf(references(source)), storyOf(references(elsewhere)));
+    EXPECT_EQ(storyOf(referenceNames(source)), storyOf(referenceNames(elsewhere)));
     const AssociationQuery roles = {.role = "NoSuchRole", .resultRole = "NoSuchRole"};
     const AssociationQuery all = {.resultClass = "CIM_NoSuchClass", .role = "NoSuchRole", .properties = {"NoSuch"}};
     EXPECT_EQ(storyOf(associators(source)), storyOf(associators(source, roles)));
@@ -401,6 +406,25 @@ class AssociationTest : public ::testing::Test {
       broker.serve(otherClass, objects).throws = true;
       EXPECT_THROW(upCall.run(), InjectedFailure);
       broker.serve(otherClass, objects);
+    }
+  }
+
+  // All that is made lies in the request's namespace, whichever that is.
+  void expectTheRequestsNamespaceEverywhere(const Path& left, const Path& right) {
+    const std::vector<Request> usual = allRequests(pairOf(left, right), left, right);
+    std::vector<Story> stories;
+    for (const Request& request : usual) stories.push_back(storyOf(request.run()));
+
+    nameSpace = "root/lab";
+    const Path otherLeft = left.in(nameSpace);
+    const Path otherRight = right.in(nameSpace);
+    const std::vector<Request> others = allRequests(pairOf(otherLeft, otherRight), otherLeft, otherRight);
+    for (std::size_t i = 0; i < others.size(); ++i) {
+      for (std::string& step : stories[i]) {
+        const std::size_t at = step.find("root/cimv2");
+        if (at != std::string::npos) step.replace(at, std::string("root/cimv2").size(), nameSpace);
+      }
+      EXPECT_EQ(stories[i], storyOf(others[i].run())) << others[i].name;
     }
   }
 
@@ -519,6 +543,7 @@ class AssociationTest : public ::testing::Test {
   RecordingLogger logger;
   World world;
   RecordingBroker broker;
+  std::string nameSpace = "root/cimv2";  // of the enumerations
   const AssociationUnderTest under;
   InstanceProvider instanceProvider;
   AssociationProvider associationProvider;

@@ -28,7 +28,7 @@ static CMPIStatus DNSClient_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext
     logError(loggerDNSClientProv, ZV_HERE, "getAllDNSClientCMPIObjPaths Failed");
     return status;
   }
-  returnAll(result, paths);
+  for (const CMPIObjectPath* path : paths) returnObjectPath(result, path);
   returnDone(result);
   ZV_PROVIDER_EXIT(loggerDNSClientProv);
   return status;
@@ -45,7 +45,7 @@ static CMPIStatus DNSClient_EnumInstances(CMPIInstanceMI*, const CMPIContext*, c
     logError(loggerDNSClientProv, ZV_HERE, "getAllDNSClientCMPIInstances Failed");
     return status;
   }
-  returnAll(result, instances);
+  for (const CMPIInstance* instance : instances) returnInstance(result, instance);
   returnDone(result);
   ZV_PROVIDER_EXIT(loggerDNSClientProv);
   return status;
@@ -63,7 +63,7 @@ bool returnByName(CMPIString* name, const CMPIResult* result, const CMPIObjectPa
     logError(loggerDNSClientProv, site, "getOneDNSClientCMPIInstance Failed");
     return false;
   }
-  returnAll(result, instances);
+  for (const CMPIInstance* instance : instances) returnInstance(result, instance);
   return true;
 }
 

@@ -455,6 +455,11 @@ TEST_F(GeneralElementSettingData, EveryUpCallHasTheOperationsContext) {
   expectUpCallsInTheOperationsContext(allRequests(pair("host1"), generalSettingPath(), systemPath("host1")), 7);
 }
 
+TEST_F(GeneralElementSettingData, EverythingLiesInTheNamespaceOfTheRequest) {
+  install({"host1"});
+  expectTheRequestsNamespaceEverywhere(systemPath("host1"), generalSettingPath());
+}
+
 TEST_F(GeneralElementSettingData, SurvivesEveryFailureOfTheBroker) {
   install({"host1", "host1", "host2"});
   expectToSurviveEveryFailure(allRequests(pair("host1"), generalSettingPath(), systemPath("host1")));

@@ -487,6 +487,11 @@ TEST_F(HostedAccessPoint, EveryUpCallHasTheOperationsContext) {
   expectUpCallsInTheOperationsContext(allRequests(pair("host1", "eth0"), endpointPath("eth0"), systemPath("host1")), 7);
 }
 
+TEST_F(HostedAccessPoint, EverythingLiesInTheNamespaceOfTheRequest) {
+  install({"eth0"}, {"host1"});
+  expectTheRequestsNamespaceEverywhere(systemPath("host1"), endpointPath("eth0"));
+}
+
 TEST_F(HostedAccessPoint, SurvivesEveryFailureOfTheBroker) {
   install({"eth0", "eth1"}, {"host1", "host2"});
   expectToSurviveEveryFailure(allRequests(pair("host1", "eth1"), endpointPath("eth1"), systemPath("host1")));

@@ -357,14 +357,14 @@ TEST_F(RemoteAccessAvailableToElement, SourcesKeyIsReadBeforeTheResultClassIsTes
 
 TEST_F(RemoteAccessAvailableToElement, PathsThatCouldNotBeFetchedLeaveTheirCode) {
   installOneOfEach();
-  for (const auto& [source, className] :
-       {std::pair(endpointPath("eth0"), kServer), std::pair(serverPath("192.0.2.1"), kEndpoint)}) {
-    const Path& from = source;
+  using Case = std::pair<Path, const char*>;
+  for (const Case& one : {Case(endpointPath("eth0"), kServer), Case(serverPath("192.0.2.1"), kEndpoint)}) {
     const auto end = [&](const std::function<Outcome()>& run) {
-      return endOf(failing(newPath(className), Mode::RcAndNull, run, 2));
+      return endOf(failing(newPath(one.second), Mode::RcAndNull, run, 2));
     };
-    EXPECT_THAT(end([&] { return associatorNames(from); }), ElementsAre("CMPI_RC_ERR_FAILED", "not done, not marked"));
-    EXPECT_THAT(end([&] { return referenceNames(from); }),
+    EXPECT_THAT(end([&] { return associatorNames(one.first); }),
+                ElementsAre("CMPI_RC_ERR_FAILED", "not done, not marked"));
+    EXPECT_THAT(end([&] { return referenceNames(one.first); }),
                 ElementsAre("CMPI_RC_ERR_FAILED", "not done, not marked", testing::HasSubstr("CMPIObjPaths Failed")));
   }
 }
@@ -515,6 +515,11 @@ TEST_F(RemoteAccessAvailableToElement, RolesAndTheArgumentsOfReferencesAreNotRea
   expectUnreadArgumentsIgnored(endpointPath("eth0"));
   expectUnreadArgumentsIgnored(serverPath("192.0.2.1"));
   EXPECT_THAT(references(serverPath("192.0.2.1"), {.role = "Dependent"}).instances(), SizeIs(2));
+}
+
+TEST_F(RemoteAccessAvailableToElement, EverythingLiesInTheNamespaceOfTheRequest) {
+  installOneOfEach();
+  expectTheRequestsNamespaceEverywhere(serverPath("192.0.2.1"), endpointPath("eth0"));
 }
 
 TEST_F(RemoteAccessAvailableToElement, SurvivesEveryFailureOfTheBroker) {

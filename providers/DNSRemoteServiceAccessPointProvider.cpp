@@ -21,7 +21,7 @@ static CMPIStatus DNSRemoteServiceAccessPoint_EnumInstanceNames(CMPIInstanceMI*,
     logError(loggerDNSRemoteSAP, ZV_HERE, "getAllDNSServerCMPIObjPaths Failed");
     return status;
   }
-  returnAll(result, paths);
+  for (const CMPIObjectPath* path : paths) returnObjectPath(result, path);
   returnDone(result);
   ZV_PROVIDER_EXIT(loggerDNSRemoteSAP);
   return status;
@@ -39,7 +39,7 @@ static CMPIStatus DNSRemoteServiceAccessPoint_EnumInstances(CMPIInstanceMI*, con
     logError(loggerDNSRemoteSAP, ZV_HERE, "getAllDNSServerCMPIInstances Failed");
     return status;
   }
-  returnAll(result, instances);
+  for (const CMPIInstance* instance : instances) returnInstance(result, instance);
   returnDone(result);
   ZV_PROVIDER_EXIT(loggerDNSRemoteSAP);
   return status;
@@ -57,7 +57,7 @@ bool returnByName(CMPIString* name, const CMPIResult* result, const CMPIObjectPa
     logError(loggerDNSRemoteSAP, site, "getOneDNSServerCMPIInstance Failed");
     return false;
   }
-  returnAll(result, instances);
+  for (const CMPIInstance* instance : instances) returnInstance(result, instance);
   return true;
 }
 

@@ -486,6 +486,11 @@ TEST_F(SAPSAPDependency, EveryUpCallHasTheOperationsContext) {
                                       7);
 }
 
+TEST_F(SAPSAPDependency, EverythingLiesInTheNamespaceOfTheRequest) {
+  install({"eth0"}, {"eth0"});
+  expectTheRequestsNamespaceEverywhere(ipEndpointPath("eth0"), endpointPath("eth0"));
+}
+
 TEST_F(SAPSAPDependency, SurvivesEveryFailureOfTheBroker) {
   install({"eth0", "eth1"}, {"eth0", "eth1"});
   expectToSurviveEveryFailure(allRequests(pair("eth1", "eth1"), endpointPath("eth1"), ipEndpointPath("eth1")));

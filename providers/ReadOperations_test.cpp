@@ -50,7 +50,9 @@ const Reader kReaders[] = {
 class Reading : public ::testing::TestWithParam<Reader> {
  protected:
   // Two endpoints and two servers, neither in the order of their names.
-  void haveBoth() { world.nic("eth1", {.suffixes = {"example.org"}}).nic("eth0", {.servers = {"2001:db8::1", "192.0.2.1"}}).install(); }
+  void haveBoth() {
+    world.nic("eth1", {.suffixes = {"example.org"}}).nic("eth0", {.servers = {"2001:db8::1", "192.0.2.1"}}).install();
+  }
   void haveNone() { world.host().install(); }
 
   static Path classPath() { return Path(GetParam().className); }

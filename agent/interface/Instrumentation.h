@@ -28,8 +28,8 @@ class ZORVA_AGENT_API Instrumentation {
   // without blocking, whether the host has changed since the tree was last read, and reads it again only then.
   void selectNode(NodeLexicon::NodeType type);
 
-  // Places the cursor on the node at that path, or on none where the tree has no such path. Does not look at the host: a
-  // cursor that already stands in a snapshot stays in it, any other uses the latest one.
+  // Places the cursor on the node at that path, or on none where the tree has no such path. Does not look at the host:
+  // a cursor that already stands in a snapshot stays in it, any other uses the latest one.
   void selectNode(const std::string& path);
 
   // True while the cursor stands on a node.
@@ -46,14 +46,15 @@ class ZORVA_AGENT_API Instrumentation {
   bool getProperty(NodeLexicon::Properties property, unsigned int& value) const;
   bool getProperty(NodeLexicon::Properties property, std::vector<std::string>& value) const;
 
-  // Store a property of the current node, so that every cursor placed by type from now on sees it, in this process and in
-  // others. True when the value is stored; false, with the reason in the agent's log, where it could not be, where the
-  // property is not one that can be set, or where the cursor stands on no node. What this cursor itself sees stays as it is.
+  // Store a property of the current node, so that every cursor placed by type from now on sees it, in this process and
+  // in others. True when the value is stored; false, with the reason in the agent's log, where it could not be, where
+  // the property is not one that can be set, or where the cursor stands on no node. What this cursor itself sees stays
+  // as it is.
   bool setProperty(NodeLexicon::Properties property, std::string& value);
   bool setProperty(NodeLexicon::Properties property, std::vector<std::string> value);
 
-  // The path of the parent of the current node, which selectNode takes; empty for the root or where the cursor stands on
-  // no node. A path stays the same while the node exists.
+  // The path of the parent of the current node, which selectNode takes; empty for the root or where the cursor stands
+  // on no node. A path stays the same while the node exists.
   std::string getPathToParentNode() const;
 
   // The description of the current node, empty where it has none: the product or "Computer" for the host, exactly "BMC"

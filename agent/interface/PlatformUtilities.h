@@ -9,8 +9,8 @@ namespace ZV {
 
 namespace PlatformUtilities {
 
-// The agent's data directory, with a slash at its end. The text belongs to the agent and stays valid and unchanged until
-// the agent's library is unloaded. Thread-safe.
+// The agent's data directory, with a slash at its end. The text belongs to the agent and stays valid and unchanged
+// until the agent's library is unloaded. Thread-safe.
 ZORVA_AGENT_API const char* getMaroviaDataDir();
 
 }  // namespace PlatformUtilities

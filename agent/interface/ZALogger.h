@@ -21,8 +21,8 @@ class ZORVA_AGENT_API ZALogger {
   // message: the text, in any bytes; control characters in it are written escaped.
   static void logLevelMessage(const char* function, const char* file, int line, const std::string& category, int level,
                               char* reserved1, int reserved2, int reserved3, const std::string& message);
-  static void traceLevelMessage(const char* function, const char* file, int line, const std::string& category, int level,
-                                char* reserved1, int reserved2, int reserved3, const std::string& message);
+  static void traceLevelMessage(const char* function, const char* file, int line, const std::string& category,
+                                int level, char* reserved1, int reserved2, int reserved3, const std::string& message);
 };
 
 // Gathers the text of one line. Belongs to one thread.
@@ -50,7 +50,8 @@ class ZORVA_AGENT_API ZAMessageBuffer {
   std::unique_ptr<Stream> stream_;
 };
 
-// Appends the address that the pointer holds, in the form of the stream's const void* inserter; never what it points at.
+// Appends the address that the pointer holds, in the form of the stream's const void* inserter; never what it points
+// at.
 template <typename T>
 ZAMessageBuffer& operator<<(ZAMessageBuffer& buffer, T* pointer) {
   static_cast<std::ostream&>(buffer) << static_cast<const void*>(pointer);

@@ -45,8 +45,8 @@ class ZALoggerTest : public ::testing::Test {
 
 TEST_F(ZALoggerTest, ALineHasTimeLevelCategoryFunctionFileLineAndText) {
   log(6000, "what happened");
-  const std::regex form(
-      R"(\d{4}-\d\d-\d\dT\d\d:\d\d:\d\d\.\d{3}[+-]\d\d:\d\d 6000 Zorvagent\.Test work agent/Work\.cpp:12 what happened\n)");
+  const std::regex form(R"(\d{4}-\d\d-\d\dT\d\d:\d\d:\d\d\.\d{3}[+-]\d\d:\d\d )"
+                        R"(6000 Zorvagent\.Test work agent/Work\.cpp:12 what happened\n)");
   EXPECT_TRUE(std::regex_match(logged(), form)) << logged();
 }
 

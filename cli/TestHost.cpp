@@ -1,0 +1,153 @@
+#include "cli/TestHost.h"
+
+#include <fcntl.h>
+#include <poll.h>
+#include <stdlib.h>
+#include <sys/ioctl.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <array>
+#include <filesystem>
+#include <stdexcept>
+
+#include "cli/Text.h"
+
+namespace zorva::cli {
+
+namespace {
+
+struct Pair {
+  int reader;
+  int writer;
+};
+
+Pair makePipe() {
+  int ends[2];
+  if (::pipe2(ends, O_CLOEXEC) != 0) throw std::runtime_error("no pipe");
+  return {ends[0], ends[1]};
+}
+
+/// A terminal of 60 columns: what is written to one end is read at the other.
+Pair makeTerminal() {
+  const int master = ::posix_openpt(O_RDWR | O_NOCTTY | O_CLOEXEC);
+  if (master < 0 || ::grantpt(master) != 0 || ::unlockpt(master) != 0) throw std::runtime_error("no terminal");
+  const int terminal = ::open(::ptsname(master), O_RDWR | O_NOCTTY | O_CLOEXEC);
+  winsize size{};
+  size.ws_col = 60;
+  size.ws_row = 24;
+  ::ioctl(terminal, TIOCSWINSZ, &size);
+  return {master, terminal};
+}
+
+Pair makeOutput(OutputTo output) {
+  if (output == OutputTo::Terminal) return makeTerminal();
+  if (output == OutputTo::Pipe) return makePipe();
+  return {::open("/dev/null", O_RDONLY | O_CLOEXEC), ::open("/dev/full", O_WRONLY | O_CLOEXEC)};
+}
+
+/// Reads both to their ends.
+void collect(int out, int err, Outcome& outcome) {
+  std::array<pollfd, 2> open{{{out, POLLIN, 0}, {err, POLLIN, 0}}};
+  std::string* const texts[] = {&outcome.out, &outcome.err};
+  for (int left = 2; left > 0;) {
+    ::poll(open.data(), open.size(), -1);
+    for (std::size_t i = 0; i < open.size(); ++i) {
+      if (open[i].fd < 0 || open[i].revents == 0) continue;
+      char buffer[4096];
+      const ssize_t count = ::read(open[i].fd, buffer, sizeof buffer);
+      if (count > 0) {
+        texts[i]->append(buffer, static_cast<std::size_t>(count));
+      } else {
+        ::close(open[i].fd);
+        open[i].fd = -1;
+        --left;
+      }
+    }
+  }
+}
+
+int exitCodeOf(pid_t child) {
+  int status = 0;
+  ::waitpid(child, &status, 0);
+  return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
+}
+
+[[noreturn]] void become(const std::vector<std::string>& words, int out, int err) {
+  ::dup2(::open("/dev/null", O_RDONLY), STDIN_FILENO);
+  ::dup2(out, STDOUT_FILENO);
+  ::dup2(err, STDERR_FILENO);
+  std::vector<char*> arguments;
+  std::string program = ZORVA_BIN_DIR "/zorvactl";
+  arguments.push_back(program.data());
+  std::vector<std::string> copies = words;
+  for (std::string& word : copies) arguments.push_back(word.data());
+  arguments.push_back(nullptr);
+  ::execv(arguments[0], arguments.data());
+  ::_exit(127);
+}
+
+}  // namespace
+
+TestHost::TestHost(const std::vector<std::string>& interfaces) {
+  directory_.write("agent.toml", "[agent]\ndata_dir = \"data\"\n[tree]\nsource = \"file\"\nfile = \"tree.json\"\n");
+  std::filesystem::create_directory(directory_ / "data");
+  writeTree(R"({"system_name": "host1", "nodes": [{"type": "System", "name": "system", "description": "Computer",)"
+            R"("children": [)" +
+            joined(interfaces, ", ") + "]}]}");
+}
+
+TestHost::TestHost(const Configuration& configuration) {
+  std::string text = configuration.toml;
+  for (std::size_t at = text.find("DIR"); at != std::string::npos; at = text.find("DIR", at)) {
+    text.replace(at, 3, directory_.path());
+  }
+  directory_.write("agent.toml", text);
+}
+
+void TestHost::writeTree(const std::string& json) const { directory_.write("tree.json", json); }
+
+std::string TestHost::port(const std::string& name, const std::string& properties) {
+  std::string usual =
+      R"("name": ")" + name + R"(", "host_name": "host1", "enabled_state": 1, "protocol_if_type": 4097)";
+  if (properties.find("dns_server_addresses") == std::string::npos) {
+    usual += R"(, "dns_server_addresses": ["192.0.2.53", "2001:db8::53"])";
+  }
+  if (!properties.empty()) usual += ", " + properties;
+  return R"({"type": "Port", "name": ")" + name +
+         R"(", "description": "", "children": [{"type": "NetworkIPConfig", "name": "ip", "description": "", )"
+         R"("properties": {)" +
+         usual + "}}]}";
+}
+
+std::vector<std::string> TestHost::twoInterfaces() {
+  return {port("eth0", R"("domain_name": "example.org", "dns_suffixes": ["example.org", "example.net"])"),
+          port("eth1")};
+}
+
+Outcome TestHost::run(const std::vector<std::string>& words, OutputTo output) const {
+  return runWith({}, words, output);
+}
+
+Outcome TestHost::runWith(const std::vector<std::pair<std::string, std::string>>& environment,
+                          const std::vector<std::string>& words, OutputTo output) const {
+  const Pair out = makeOutput(output);
+  const Pair err = makePipe();
+  const pid_t child = ::fork();
+  if (child < 0) throw std::runtime_error("no process");
+  if (child == 0) {
+    ::setenv("ZORVAGENT_CONFIG", (directory_ / "agent.toml").c_str(), 1);
+    ::setenv("TERM", "xterm", 1);
+    ::unsetenv("NO_COLOR");
+    for (const auto& [name, value] : environment) ::setenv(name.c_str(), value.c_str(), 1);
+    become(words, out.writer, err.writer);
+  }
+  ::close(out.writer);
+  ::close(err.writer);
+  Outcome outcome;
+  collect(out.reader, err.reader, outcome);
+  outcome.exitCode = exitCodeOf(child);
+  return outcome;
+}
+
+}  // namespace zorva::cli
