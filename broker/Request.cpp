@@ -67,97 +67,6 @@ struct Request::Association {
   const char* resultRole;
 };
 
-/// Between a provider and the taker: lets pass what was asked for, with the mask of the wanted properties.
-class Request::Filter : public Receiver {
- public:
-  Filter(Request& request, const Shape& shape, const ClassInfo* requested, std::string_view nameSpace, Taker& taker)
-      : request_(request), shape_(shape), requested_(requested), nameSpace_(nameSpace), taker_(taker) {}
-
-  const ClassInfo* within = nullptr;    ///< results are of this class or below; null: any
-  const ClassInfo* servedAs = nullptr;  ///< results belong to this class, not to one below that is served itself
-
-  /// The taker wants no more.
-  bool full() const noexcept { return full_; }
-
-  bool takeInstance(const InstanceObject& instance) override {
-    if (!admits(*instance.info)) return true;
-    const InstanceObject* named = &instance;
-    if (instance.nameSpace->length == 0) {
-      InstanceObject* copy = copyInstance(request_.arena(), instance);
-      copy->nameSpace = request_.arena().intern(nameSpace_);
-      named = copy;
-    }
-    full_ = !taker_.takeInstance(*named, maskOf(*instance.info));
-    return !full_;
-  }
-
-  bool takePath(const PathObject& path) override {
-    if (path.info == nullptr) {
-      request_.core_.log(LogLevel::Warning, "a provider returned a path of the unknown class " +
-                                                quoted(path.className->view()) + "; it was dropped");
-      return true;
-    }
-    if (!admits(*path.info)) return true;
-    const PathObject* named = &path;
-    if (path.nameSpace->length == 0) {
-      PathObject* copy = copyPath(request_.arena(), path);
-      copy->setNameSpace(nameSpace_);
-      named = copy;
-    }
-    full_ = !taker_.takePath(*named);
-    return !full_;
-  }
-
- private:
-  bool admits(const ClassInfo& info) const {
-    if (within != nullptr && &info != within && !info.isA(*within)) return false;
-    if (servedAs == nullptr || &info == servedAs) return true;
-    const schema::Class* nearest = &info.declared();
-    while (nearest != nullptr && !isServed(*nearest)) nearest = nearest->superclass();
-    return nearest == &servedAs->declared();
-  }
-
-  bool isServed(const schema::Class& declared) const {
-    const ProviderEntry* entry = request_.core_.registry().find(nameSpace_, declared.name());
-    return entry != nullptr && (entry->kinds & InstanceMi) != 0;
-  }
-
-  bool wants(const PropertyInfo& property) const {
-    const std::string& name = property.declared->name;
-    if (requested_ != nullptr && shape_.localOnly) {
-      const schema::Class& origin = *property.declared->origin;
-      const bool local =
-          shape_.deepInheritance ? origin.isA(requested_->declared()) : &origin == &requested_->declared();
-      if (!local) return false;
-    }
-    if (requested_ != nullptr && !shape_.deepInheritance && requested_->find(name) == nullptr) return false;
-    if (!shape_.properties) return true;
-    return std::any_of(shape_.properties->begin(), shape_.properties->end(),
-                       [&name](std::string_view listed) { return schema::sameName(listed, name); });
-  }
-
-  PropertyMask maskOf(const ClassInfo& info) {
-    if (!shape_.properties && !shape_.localOnly && shape_.deepInheritance) return {};
-    for (const auto& [known, bits] : masks_) {
-      if (known == &info) return {bits.data()};
-    }
-    std::vector<std::uint64_t> bits(info.properties().size() / 64 + 1);
-    for (const PropertyInfo& property : info.properties()) {
-      if (wants(property)) bits[property.index / 64] |= std::uint64_t{1} << (property.index % 64);
-    }
-    masks_.emplace_back(&info, std::move(bits));
-    return {masks_.back().second.data()};
-  }
-
-  Request& request_;
-  const Shape& shape_;
-  const ClassInfo* const requested_;
-  const std::string nameSpace_;
-  Taker& taker_;
-  bool full_ = false;
-  std::vector<std::pair<const ClassInfo*, std::vector<std::uint64_t>>> masks_;
-};
-
 Request::Request(BrokerCore& core)
     : core_(core), scope_(core), context_(*scope_.arena().make<ContextObject>(scope_.arena())) {}
 
@@ -248,7 +157,7 @@ Status Request::call(ResultObject& result, const ProviderEntry& entry, std::stri
 }
 
 Status Request::enumerateOne(const PathObject& path, const ClassInfo& info, Form form, const Shape& shape,
-                             Filter& filter, bool& unavailable) {
+                             ResultFilter& filter, bool& unavailable) {
   const ProviderEntry& entry = *entryOf(path, info, InstanceMi);
   Status status;
   const CMPIInstanceMI* mi = core_.loader().instanceMi(entry, status);
@@ -278,7 +187,7 @@ Status Request::enumerate(const PathObject& path, Form form, const Shape& shape,
   if (served.empty()) {
     return failure(CMPI_RC_ERR_NOT_SUPPORTED, "no provider serves " + info.name() + " or a class below it");
   }
-  Filter filter(*this, shape, &info, resolved->nameSpace->view(), taker);
+  ResultFilter filter(core_, scope_, shape, &info, resolved->nameSpace->view(), taker);
   Outcome outcome;
   for (const ClassInfo* one : served) {
     const MarkGuard guard(scope_);
@@ -342,7 +251,7 @@ Status Request::get(const PathObject& path, const Shape& shape, Taker& taker) {
   }
   if (!status.ok()) return status;
   FirstTaker first(taker);
-  Filter filter(*this, shape, resolved->info, resolved->nameSpace->view(), first);
+  ResultFilter filter(core_, scope_, shape, resolved->info, resolved->nameSpace->view(), first);
   filter.within = resolved->info;
   ResultObject result(core_, ResultObject::Instances, &filter, entry->prefix);
   const char** list = providerList(shape, {resolved->info});
@@ -366,7 +275,7 @@ Status Request::create(const PathObject& path, const InstanceObject& instance, T
   given->nameSpace = resolved->nameSpace;
   FirstTaker first(taker);
   const Shape all;
-  Filter filter(*this, all, nullptr, resolved->nameSpace->view(), first);
+  ResultFilter filter(core_, scope_, all, nullptr, resolved->nameSpace->view(), first);
   ResultObject result(core_, ResultObject::Paths, &filter, entry->prefix);
   status = call(result, *entry, "CreateInstance", mi->ft->createInstance, const_cast<CMPIInstanceMI*>(mi), &context_,
                 &result, resolved, given);
@@ -462,7 +371,7 @@ Status Request::findAssociations(const PathObject& path, const FarEnd& filter, b
 }
 
 template <class Ask>
-Status Request::askEach(const std::vector<Association>& associations, const Filter& results, Ask&& ask) {
+Status Request::askEach(const std::vector<Association>& associations, const ResultFilter& results, Ask&& ask) {
   Outcome outcome;
   for (const Association& one : associations) {
     const MarkGuard guard(scope_);
@@ -488,7 +397,7 @@ Status Request::associated(const PathObject& path, Form form, const FarEnd& filt
   const ClassInfo* resultClass = nullptr;
   status = findAssociations(*resolved, filter, true, associations, resultClass);
   if (!status.ok()) return status;
-  Filter results(*this, shape, nullptr, resolved->nameSpace->view(), taker);
+  ResultFilter results(core_, scope_, shape, nullptr, resolved->nameSpace->view(), taker);
   results.within = resultClass;
   // The provider is asked without a result class: its own idea of one may know no classes above its own.
   return askEach(associations, results, [&](const Association& one, CMPIAssociationMI* mi) {
@@ -515,7 +424,7 @@ Status Request::referring(const PathObject& path, Form form, const FarEnd& filte
   const ClassInfo* unused = nullptr;
   status = findAssociations(*resolved, filter, false, associations, unused);
   if (!status.ok()) return status;
-  Filter results(*this, shape, nullptr, resolved->nameSpace->view(), taker);
+  ResultFilter results(core_, scope_, shape, nullptr, resolved->nameSpace->view(), taker);
   return askEach(associations, results, [&](const Association& one, CMPIAssociationMI* mi) {
     results.within = one.info;
     const char* name = one.info->name().c_str();

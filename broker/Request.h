@@ -1,7 +1,5 @@
 #pragma once
 
-#include <optional>
-#include <string>
 #include <string_view>
 #include <vector>
 
@@ -9,19 +7,13 @@
 #include "broker/Convert.h"
 #include "broker/Objects.h"
 #include "broker/Result.h"
+#include "broker/ResultFilter.h"
 #include "broker/Scope.h"
 
 // One request, of a client or of a provider that calls up: which providers are asked, what they are handed, and what of
 // their answers goes on. It opens a scope on its thread that ends with it.
 
 namespace zorva::broker {
-
-/// What of each instance is wanted, as Selection in Broker.h, with the names as they came.
-struct Shape {
-  bool localOnly = false;
-  bool deepInheritance = true;
-  std::optional<std::vector<std::string_view>> properties;
-};
 
 /// As AssociationFilter in Broker.h.
 struct FarEnd {
@@ -33,14 +25,6 @@ struct FarEnd {
 
 /// Instances or names: the two forms of most read operations.
 enum class Form { Instances, Paths };
-
-/// A receiver that takes instances with the mask of the properties that are wanted of them.
-class Taker {
- public:
-  virtual ~Taker() = default;
-  virtual bool takeInstance(const InstanceObject& instance, const PropertyMask& wanted) = 0;
-  virtual bool takePath(const PathObject& path) = 0;
-};
 
 class Request {
  public:
@@ -70,7 +54,6 @@ class Request {
 
  private:
   struct Association;
-  class Filter;
 
   Status tooDeep() const;
   const ProviderEntry* entryOf(const PathObject& path, const ClassInfo& info, MiKind kind) const;
@@ -84,9 +67,9 @@ class Request {
   Status call(ResultObject& result, const ProviderEntry& entry, std::string_view operation, Function function,
               Args... args);
   template <class Ask>
-  Status askEach(const std::vector<Association>& associations, const Filter& results, Ask&& ask);
-  Status enumerateOne(const PathObject& path, const ClassInfo& info, Form form, const Shape& shape, Filter& filter,
-                      bool& unavailable);
+  Status askEach(const std::vector<Association>& associations, const ResultFilter& results, Ask&& ask);
+  Status enumerateOne(const PathObject& path, const ClassInfo& info, Form form, const Shape& shape,
+                      ResultFilter& filter, bool& unavailable);
   Status findInstanceMi(const PathObject& path, std::string_view operation, PathObject*& resolved,
                         const ProviderEntry*& entry, const CMPIInstanceMI*& mi);
 

@@ -112,8 +112,7 @@ void CommandLine::addGlobalOptions() {
 void CommandLine::addPropertyOption(CLI::App* subcommand) {
   subcommand->add_option("--property", invocation_.arguments.properties, "Only this property; may be repeated")
       ->type_name("NAME")
-      ->expected(1)
-      ->take_all();
+      ->allow_extra_args(false);
 }
 
 void CommandLine::addOverviews() {

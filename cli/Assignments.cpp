@@ -32,6 +32,7 @@ broker::Scalar parseNumber(const TypedName& declared, std::string_view text) {
   std::string digits(text.substr(isNegative ? 1 : 0));
   const bool isHex = digits.starts_with("0x") || digits.starts_with("0X");
   if (isHex) digits.erase(0, 2);
+  if (digits.starts_with('-')) digits.clear();  // a second sign; the empty text is no number
   if (isNegative) digits.insert(digits.begin(), '-');
   Number number = 0;
   const char* const end = digits.data() + digits.size();

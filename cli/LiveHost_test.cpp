@@ -29,7 +29,8 @@ std::string printedInNewNetwork(const TestHost& host, const std::string& script)
 }
 
 TEST(LiveHost, CanBeShown) {
-  const TestHost host(TestHost::Configuration{kHostConfig});
+  const TestHost host;
+  host.configure(kHostConfig);
   for (const char* command : {"show", "tree", "classes", "graph"}) {
     const Outcome outcome = host.run({command});
     EXPECT_EQ(outcome.exitCode, 0) << command << ": " << outcome.err;
@@ -38,7 +39,8 @@ TEST(LiveHost, CanBeShown) {
 
 TEST(LiveHost, HasAnEndpointForALinkWhileItIsThere) {
   if (!canMakeNetworks()) GTEST_SKIP() << "no network namespace, or no bridge in one, can be made here";
-  const TestHost host(TestHost::Configuration{kHostConfig});
+  const TestHost host;
+  host.configure(kHostConfig);
   EXPECT_THAT(printedInNewNetwork(host,
                                   "ip link add zv0 type bridge\n"
                                   "$Z names ZORVA_DNSProtocolEndPoint\n"
@@ -50,7 +52,8 @@ TEST(LiveHost, HasAnEndpointForALinkWhileItIsThere) {
 
 TEST(LiveHost, GivesSettingsAFileAndChangesThem) {
   if (!canMakeNetworks()) GTEST_SKIP() << "no network namespace, or no bridge in one, can be made here";
-  const TestHost host(TestHost::Configuration{kHostConfig});
+  const TestHost host;
+  host.configure(kHostConfig);
   const std::string printed =
       printedInNewNetwork(host,
                           "ip link add zv0 type bridge\n"

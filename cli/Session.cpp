@@ -54,6 +54,35 @@ void tell(const char* kind, std::string_view what) {
   std::fwrite(line.data(), 1, line.size(), stderr);
 }
 
+/// Keeps the agent's own lines until it is known what becomes of the call.
+class HeldBackLog : public zorvagent::LogSink {
+ public:
+  explicit HeldBackLog(int level) : level_(level) {}
+  void record(const zorvagent::LogCall& call) override { recordOwn(call.level, call.message); }
+  void recordOwn(int level, const std::string& message) override {
+    if (level >= level_) lines_.push_back(message);
+  }
+  void tell() const {
+    for (const std::string& line : lines_) tellWarning(printable(line));
+  }
+
+ private:
+  int level_;
+  std::vector<std::string> lines_;
+};
+
+template <class Work>
+class Finally {
+ public:
+  explicit Finally(Work work) : work_(std::move(work)) {}
+  ~Finally() { work_(); }
+  Finally(const Finally&) = delete;
+  Finally& operator=(const Finally&) = delete;
+
+ private:
+  Work work_;
+};
+
 }  // namespace
 
 Session::Session(const Arguments& arguments)
@@ -79,7 +108,16 @@ const schema::Class& Session::classNamed(std::string_view name) {
 }
 
 std::shared_ptr<const zorvagent::TreeSnapshot> Session::tree() const {
-  return asFailure([] { return zorvagent::currentTree(); });
+  // What goes to the terminal anyway is told in this program's words, and a failure that ends it once.
+  const bool holdsBack = zorvagent::currentConfig().logTarget == "stderr";
+  HeldBackLog log(logLevel_);
+  if (holdsBack) zorvagent::setLogSink(&log);
+  const Finally restore([holdsBack] {
+    if (holdsBack) zorvagent::setLogSink(nullptr);
+  });
+  auto tree = asFailure([] { return zorvagent::currentTree(); });
+  log.tell();
+  return tree;
 }
 
 broker::Broker& Session::broker() {

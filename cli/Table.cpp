@@ -57,7 +57,8 @@ void appendRow(std::string& out, const std::vector<Cell>& row, const std::vector
   for (std::size_t line = 0; line < height; ++line) {
     std::string blanks(indent, ' ');
     for (std::size_t i = 0; i < columns.size(); ++i) {
-      const std::string_view piece = line < columns[i].size() ? std::string_view(columns[i][line]) : std::string_view();
+      std::string_view piece = line < columns[i].size() ? std::string_view(columns[i][line]) : std::string_view();
+      piece = piece.substr(0, piece.find_last_not_of(' ') + 1);
       // Blanks go out only before the next text, so that no line ends in them.
       if (!piece.empty()) out += blanks + styled(piece, row[i].style, layout);
       if (!piece.empty()) blanks.clear();

@@ -30,8 +30,8 @@ TEST(Table, HasNoBlanksAtTheEndOfALine) {
   Table table({"A", "B", "C"});
   table.add({"1", "", ""});
   table.add({"", "", "3"});
-  table.add({"1"});
-  EXPECT_EQ(table.text({}), "A  B  C\n1\n      3\n1\n");
+  table.add({"1", "blank "});
+  EXPECT_EQ(table.text({}), "A  B       C\n1\n           3\n1  blank\n");
 }
 
 TEST(Table, WrapsTheWidestColumnToFitTheTerminal) {

@@ -4,6 +4,7 @@
 #include <poll.h>
 #include <stdlib.h>
 #include <sys/ioctl.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -97,12 +98,11 @@ TestHost::TestHost(const std::vector<std::string>& interfaces) {
             joined(interfaces, ", ") + "]}]}");
 }
 
-TestHost::TestHost(const Configuration& configuration) {
-  std::string text = configuration.toml;
-  for (std::size_t at = text.find("DIR"); at != std::string::npos; at = text.find("DIR", at)) {
-    text.replace(at, 3, directory_.path());
+void TestHost::configure(std::string toml) const {
+  for (std::size_t at = toml.find("DIR"); at != std::string::npos; at = toml.find("DIR", at)) {
+    toml.replace(at, 3, directory_.path());
   }
-  directory_.write("agent.toml", text);
+  directory_.write("agent.toml", toml);
 }
 
 void TestHost::writeTree(const std::string& json) const { directory_.write("tree.json", json); }
@@ -131,6 +131,21 @@ Outcome TestHost::run(const std::vector<std::string>& words, OutputTo output) co
 
 Outcome TestHost::runWith(const std::vector<std::pair<std::string, std::string>>& environment,
                           const std::vector<std::string>& words, OutputTo output) const {
+  return runAs(::geteuid(), environment, words, output);
+}
+
+Outcome TestHost::runAsNobody(const std::vector<std::string>& words) const {
+  const unsigned nobody = 65534;
+  const bool isRoot = ::geteuid() == 0;
+  ::chmod(directory_.path().c_str(), 0755);
+  ::chmod(dataFile("").c_str(), isRoot ? 0755 : 0555);
+  Outcome outcome = runAs(isRoot ? nobody : ::geteuid(), {}, words, OutputTo::Pipe);
+  ::chmod(dataFile("").c_str(), 0755);
+  return outcome;
+}
+
+Outcome TestHost::runAs(unsigned user, const Environment& environment, const std::vector<std::string>& words,
+                        OutputTo output) const {
   const Pair out = makeOutput(output);
   const Pair err = makePipe();
   const pid_t child = ::fork();
@@ -140,6 +155,7 @@ Outcome TestHost::runWith(const std::vector<std::pair<std::string, std::string>>
     ::setenv("TERM", "xterm", 1);
     ::unsetenv("NO_COLOR");
     for (const auto& [name, value] : environment) ::setenv(name.c_str(), value.c_str(), 1);
+    if (user != ::geteuid() && ::setuid(user) != 0) ::_exit(127);
     become(words, out.writer, err.writer);
   }
   ::close(out.writer);

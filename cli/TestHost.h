@@ -26,17 +26,17 @@ class TestHost {
   /// `interfaces` are JSON texts, each a Port node; see port().
   explicit TestHost(const std::vector<std::string>& interfaces = twoInterfaces());
 
-  /// One whose configuration is this text. DIR in it stands for the directory.
-  struct Configuration {
-    explicit Configuration(std::string text) : toml(std::move(text)) {}
-    std::string toml;
-  };
-  explicit TestHost(const Configuration& configuration);
+  /// Puts this text in the place of the configuration. DIR in it stands for the host's directory.
+  void configure(std::string toml) const;
 
   /// Runs zorvactl with these words.
   Outcome run(const std::vector<std::string>& words, OutputTo output = OutputTo::Pipe) const;
   Outcome runWith(const std::vector<std::pair<std::string, std::string>>& environment,
                   const std::vector<std::string>& words, OutputTo output = OutputTo::Pipe) const;
+
+  /// Runs it as a user who owns nothing here, where the tests are run by root; else as who runs them, with the host's
+  /// directories closed to them for writing. Exit code 127: that user cannot run the program.
+  Outcome runAsNobody(const std::vector<std::string>& words) const;
 
   const zorvagent::testing::TemporaryDirectory& directory() const { return directory_; }
   std::string dataFile(const std::string& name) const { return directory_ / "data/" + name; }
@@ -47,6 +47,10 @@ class TestHost {
   static std::vector<std::string> twoInterfaces();
 
  private:
+  using Environment = std::vector<std::pair<std::string, std::string>>;
+  Outcome runAs(unsigned user, const Environment& environment, const std::vector<std::string>& words,
+                OutputTo output) const;
+
   zorvagent::testing::TemporaryDirectory directory_;
 };
 

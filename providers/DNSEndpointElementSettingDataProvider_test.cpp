@@ -19,9 +19,9 @@ const char* const kBadSetting = "CMPIObjectPath is NULL for DNS Client";
 const char* const kNoPath = "Create CMPIObjectPath failed for                     DNSEndpointElementSettingData.";
 const char* const kMalformed = "Incorrect InstanceID in the Source ObjectPath";
 
-class EndpointElementSettingData : public AssociationTest {
+class EndpointElementSettingData : public SettingAssociationTest {
  protected:
-  EndpointElementSettingData() : AssociationTest(endpointElementSettingData()) {}
+  EndpointElementSettingData() : SettingAssociationTest(endpointElementSettingData()) {}
 
   void installOne() { world.host().nic("eth0").install(); }
   // Endpoints come in the order of their names, settings in that of the interfaces.
@@ -32,21 +32,6 @@ class EndpointElementSettingData : public AssociationTest {
   static std::string token(const std::string& name) { return "log 4000 VARIABLE instance_tokens[1] = " + name; }
   Story setAll(const std::string& instance, const std::string& endpoint, const std::string& setting) const {
     return tell({setEnds(instance, endpoint, setting), flags(instance, 2)});
-  }
-
-  using Operation = std::function<Outcome()>;
-  std::vector<Operation> enumerations() {
-    return {[this] { return enumerateInstanceNames(); }, [this] { return enumerateInstances(); }};
-  }
-  std::vector<Operation> allFrom(const Path& source) {
-    return {[this, source] { return associators(source); }, [this, source] { return associatorNames(source); },
-            [this, source] { return references(source); }, [this, source] { return referenceNames(source); }};
-  }
-  // Those that fetch paths at the far end.
-  std::vector<Operation> pathsFrom(const Path& source) {
-    std::vector<Operation> all = allFrom(source);
-    all.erase(all.begin());
-    return all;
   }
 };
 
@@ -176,7 +161,7 @@ TEST_F(EndpointElementSettingData, EveryFailureOfTheBuilderEndsEmptyAndShowsNoCo
   installThree();
   const auto expectEmpty = [this](const Outcome& outcome, const char* text, bool builderIsMarked = false) {
     EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked", text));
-    EXPECT_EQ(0U, outcome.calls.count("returnInstance") + outcome.calls.count("returnObjectPath"));
+    EXPECT_EQ(0U, handedOut(outcome));
     EXPECT_EQ(builderIsMarked, outcome.lines.exited(kBuilder));
   };
   for (const Operation& run : enumerations()) {
@@ -285,7 +270,7 @@ TEST_F(EndpointElementSettingData, SettingOfNoEndpointLeadsNowhere) {
   for (const Operation& run : allFrom(settingPath("Computer%eth7"))) {
     const Outcome outcome = run();
     EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
-    EXPECT_EQ(0U, outcome.calls.count("returnInstance") + outcome.calls.count("returnObjectPath"));
+    EXPECT_EQ(0U, handedOut(outcome));
   }
 }
 
@@ -425,7 +410,7 @@ TEST_F(EndpointElementSettingData, EndpointOfNoSettingLeadsNowhere) {
   for (const Operation& run : allFrom(endpointPath("eth7"))) {
     const Outcome outcome = run();
     EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
-    EXPECT_EQ(0U, outcome.calls.count("returnInstance") + outcome.calls.count("returnObjectPath"));
+    EXPECT_EQ(0U, handedOut(outcome));
   }
 }
 

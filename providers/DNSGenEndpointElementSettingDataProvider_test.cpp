@@ -25,9 +25,9 @@ const char* const kNoPathInBuilder =
 const char* const kNoPathForNames =
     "Create CMPIObjectPath failed for                     DNSGenEndpointElementSettingData Class.";
 
-class GenEndpointElementSettingData : public AssociationTest {
+class GenEndpointElementSettingData : public SettingAssociationTest {
  protected:
-  GenEndpointElementSettingData() : AssociationTest(genEndpointElementSettingData()) {}
+  GenEndpointElementSettingData() : SettingAssociationTest(genEndpointElementSettingData()) {}
 
   void installOne() { world.host().nic("eth0").install(); }
   void installThree() { world.host().nic("eth1").nic("eth0").bmc().nic("bmc0").install(); }
@@ -116,12 +116,12 @@ TEST_F(GenEndpointElementSettingData, EveryAssociationIsCurrentAndDefault) {
 
 TEST_F(GenEndpointElementSettingData, HostWithoutGeneralSettingHasNoAssociation) {
   installServiceProcessorAlone();
-  for (const Outcome& outcome :
-       {enumerateInstanceNames(), enumerateInstances(), getInstance(pairOf(endpointPath("bmc0"), generalSettingPath())),
-        associators(endpointPath("bmc0")), associatorNames(endpointPath("bmc0")), references(endpointPath("bmc0")),
-        referenceNames(endpointPath("bmc0"))}) {
+  std::vector<Operation> all = instanceOperations(pairOf(endpointPath("bmc0"), generalSettingPath()));
+  for (const Operation& run : allFrom(endpointPath("bmc0"))) all.push_back(run);
+  for (const Operation& run : all) {
+    const Outcome outcome = run();
     EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
-    EXPECT_EQ(0U, outcome.calls.count("returnInstance") + outcome.calls.count("returnObjectPath"));
+    EXPECT_EQ(0U, handedOut(outcome));
   }
 }
 
@@ -351,20 +351,15 @@ TEST_F(GenEndpointElementSettingData, ReferencesCarryAllPropertiesWhateverIsAske
 
 TEST_F(GenEndpointElementSettingData, FailedFetchOfEndpointsLeavesOpenWithoutAWord) {
   world.host().install();
-  const Path source = generalSettingPath();
-  for (const Outcome& outcome :
-       {associators(source), associatorNames(source), references(source), referenceNames(source)}) {
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "not done, not marked"));
+  for (const Operation& run : allFrom(generalSettingPath())) {
+    EXPECT_THAT(endOf(run()), ElementsAre("CMPI_RC_OK", "not done, not marked"));
   }
 }
 
 TEST_F(GenEndpointElementSettingData, EndpointPathThatCannotBeMadeShowsTheBrokersCode) {
   installThree();
   const Path source = generalSettingPath();
-  const std::function<Outcome()> operations[] = {[&] { return associatorNames(source); },
-                                                 [&] { return references(source); },
-                                                 [&] { return referenceNames(source); }};
-  for (const auto& run : operations) {
+  for (const Operation& run : pathsFrom(source)) {
     const Outcome outcome = failing(newPath(kEndpointClass), Mode::RcAndNull, run, 3);  // the far end is the first
     EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_ERR_FAILED", "not done, not marked"));
     EXPECT_THAT(pairsOf(outcome), IsEmpty());
@@ -374,10 +369,7 @@ TEST_F(GenEndpointElementSettingData, EndpointPathThatCannotBeMadeShowsTheBroker
 TEST_F(GenEndpointElementSettingData, FailedFetchOfSettingPathsIsToldAndLeftOpen) {
   installOne();
   const Path source = endpointPath("eth0");
-  const std::function<Outcome()> operations[] = {[&] { return associatorNames(source); },
-                                                 [&] { return references(source); },
-                                                 [&] { return referenceNames(source); }};
-  for (const auto& run : operations) {
+  for (const Operation& run : pathsFrom(source)) {
     const Outcome outcome = failing(newPath(kGeneralSettingClass), Mode::RcAndNull, run, 2);
     EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "not done, not marked", kNoSettingPaths));
     EXPECT_THAT(pairsOf(outcome), IsEmpty());

@@ -13,26 +13,12 @@ using ::testing::StartsWith;
 const char* const kAssociation = "ZORVA_DNSGenOrderedComponent";
 const char* const kBuilder = "DNSGeneralOrderedComponentCMPIInstances";
 
-const char* const kNoAssignmentPath = "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.";
-const char* const kNoAssignmentPathForNames = "Create CMPIObjectPath failed for ComputerSystem.";
-const char* const kNoAssignments = "CBEnumInstanceNames Failed for the target Class";
-const char* const kNoSettingsInBuilder = "getAllDNSGeneralSettingDataCMPIObjectPaths failed";
-const char* const kNoSettingPaths = "getAllDNSGeneralSettingDataCMPIObjectPaths Failed";
-const char* const kNoSettings = "getAllDNSGeneralSettingDataCMPIInstances Failed";
-const char* const kBadSetting = "CMPIObjectPath is NULL for DNS Client";
-const char* const kNoPath = "Create CMPIObjectPath failed for                     DNSGeneralOrderedComponent.";
-
 const Path kAssignment = ipAssignmentPath("Computer%eth0%ipv4");
 
-class GeneralOrderedComponent : public AssociationTest {
+class GeneralOrderedComponent : public SettingAssociationTest {
  protected:
-  GeneralOrderedComponent() : AssociationTest(generalOrderedComponent()) {}
+  GeneralOrderedComponent() : SettingAssociationTest(generalOrderedComponent()) {}
 
-  void serveAssignments(std::initializer_list<const char*> instanceIDs) {
-    std::vector<Instance> all;
-    for (const char* instanceID : instanceIDs) all.push_back(objectOf(ipAssignmentPath(instanceID)));
-    broker.serve(kIpAssignmentClass, all);
-  }
   void installOne() {
     world.host().nic("eth0").install();
     serveAssignments({"Computer%eth0%ipv4"});
@@ -59,23 +45,6 @@ class GeneralOrderedComponent : public AssociationTest {
                  {"newInstance(OP4)", R"(I1.setPropertyFilter(null, {"GroupComponent", "PartComponent"}))"},
                  setAll("I1", "OP3", "OP2"),
                  {builderLine("EXITING")}});
-  }
-
-  using Operation = std::function<Outcome()>;
-  std::vector<Operation> enumerations() {
-    return {[this] { return enumerateInstanceNames(); }, [this] { return enumerateInstances(); }};
-  }
-  std::vector<Operation> instanceOperations() {
-    std::vector<Operation> all = enumerations();
-    all.push_back([this] { return getInstance(pairOf(kAssignment, generalSettingPath())); });
-    return all;
-  }
-  std::vector<Operation> allFrom(const Path& source) {
-    return {[this, source] { return associators(source); }, [this, source] { return associatorNames(source); },
-            [this, source] { return references(source); }, [this, source] { return referenceNames(source); }};
-  }
-  static std::size_t handedOut(const Calls& calls) {
-    return calls.count("returnInstance") + calls.count("returnObjectPath");
   }
 };
 
@@ -130,20 +99,10 @@ TEST_F(GeneralOrderedComponent, BuilderReadsTheKeysOfBothEndsForNothing) {
   }
 }
 
-TEST_F(GeneralOrderedComponent, AssignmentStaysAsTheBrokerGaveIt) {
-  world.host().nic("eth0").install();
-  Instance served = objectOf(kAssignment);
-  served.path.host = "elsewhere";
-  broker.serve(kIpAssignmentClass, {served});
-  const Instance one = enumerateInstances().instances().at(0);
-  EXPECT_EQ("elsewhere", one["GroupComponent"].path().host);
-  EXPECT_EQ("host1", one["PartComponent"].path().host);
-}
-
 TEST_F(GeneralOrderedComponent, WithoutSettingsAnExceptionLeavesTheInstanceOperations) {
   installServiceProcessorAlone();
   serveAssignments({"first", "second"});
-  for (const Operation& run : instanceOperations()) {
+  for (const Operation& run : instanceOperations(pairOf(kAssignment, generalSettingPath()))) {
     logger.clear();
     try {
       run();
@@ -152,7 +111,8 @@ TEST_F(GeneralOrderedComponent, WithoutSettingsAnExceptionLeavesTheInstanceOpera
       EXPECT_THAT(error.what(), StartsWith("vector::_M_range_check"));
     }
     const LogLines lines = logger.pairs();
-    EXPECT_EQ(0U, handedOut(broker.calls()) + broker.calls().count("returnDone"));
+    EXPECT_EQ(0U, broker.calls().count("returnInstance") + broker.calls().count("returnObjectPath") +
+                      broker.calls().count("returnDone"));
     EXPECT_THAT(lines.ofCategory(under.category).ofKind(LineKind::Exiting), IsEmpty());
     EXPECT_THAT(lines.ofCategory(under.category).errors(), IsEmpty());
   }
@@ -161,10 +121,10 @@ TEST_F(GeneralOrderedComponent, WithoutSettingsAnExceptionLeavesTheInstanceOpera
 TEST_F(GeneralOrderedComponent, WithoutSettingsAndAssignmentsTheResultIsEmpty) {
   installServiceProcessorAlone();
   serveAssignments({});
-  for (const Operation& run : instanceOperations()) {
+  for (const Operation& run : instanceOperations(pairOf(kAssignment, generalSettingPath()))) {
     const Outcome outcome = run();
     EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
-    EXPECT_EQ(0U, handedOut(outcome.calls));
+    EXPECT_EQ(0U, handedOut(outcome));
   }
 }
 
@@ -174,9 +134,9 @@ TEST_F(GeneralOrderedComponent, WithoutSettingsTheAssociationOperationsEndAsUsua
   for (const Operation& run : allFrom(kAssignment)) {
     const Outcome outcome = run();
     EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
-    EXPECT_EQ(0U, handedOut(outcome.calls));
+    EXPECT_EQ(0U, handedOut(outcome));
   }
-  for (const Operation& run : allFrom(generalSettingPath())) EXPECT_EQ(2U, handedOut(run().calls));
+  for (const Operation& run : allFrom(generalSettingPath())) EXPECT_EQ(2U, handedOut(run()));
 }
 
 // Two settings are what no host has.
@@ -192,46 +152,6 @@ TEST_F(GeneralOrderedComponent, OfTwoSettingsTheBuilderTakesTheFirstAndReference
   EXPECT_THAT(pairsOf(references(kAssignment)), both);
   EXPECT_THAT(pairsOf(referenceNames(kAssignment)), both);
   EXPECT_THAT(textsOf(associatorNames(kAssignment).paths(), "InstanceID"), ElementsAre("dnsgen1:host1", "second"));
-}
-
-TEST_F(GeneralOrderedComponent, EveryFailureOfTheBuilderEndsEmptyAndShowsNoCode) {
-  installThree();
-  const auto expectEmpty = [this](const Outcome& outcome, const char* text) {
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked", text));
-    EXPECT_EQ(0U, handedOut(outcome.calls));
-    EXPECT_FALSE(outcome.lines.exited(kBuilder));
-  };
-  for (const Operation& run : enumerations()) {
-    for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
-      expectEmpty(failing(newPath(kIpAssignmentClass), mode, run), kNoAssignmentPath);
-      expectEmpty(failing(newPath(kAssociation), mode, run, 3), kNoPath);
-    }
-    expectEmpty(failing("enumerateInstanceNames", Mode::RcAndNull, run), kNoAssignments);
-    expectEmpty(failing("enumerateInstanceNames", Mode::SetRc, run), kNoAssignments);
-    expectEmpty(losingHandles(kGeneralSettingClass, kAssociation, run), kBadSetting);
-  }
-}
-
-TEST_F(GeneralOrderedComponent, BuilderWithoutSettingPathsMarksItsExitAsAnOperationDoes) {
-  installThree();
-  const Outcome outcome =
-      failing(newPath(kGeneralSettingClass), Mode::RcAndNull, [this] { return enumerateInstances(); });
-  EXPECT_EQ(tell({entry(operation("EnumInstances")),
-                  {builderLine("ENTERING"), newPath(kIpAssignmentClass), "enumerateInstanceNames(OP1)",
-                   newPath(kGeneralSettingClass) + " fails: rc set and null", error(kNoSettingsInBuilder)},
-                  exitMark(kBuilder),
-                  done(operation("EnumInstances"))}),
-            storyOf(outcome));
-  EXPECT_EQ(CMPI_RC_OK, outcome.rc);
-}
-
-TEST_F(GeneralOrderedComponent, FailureOfTheBuilderLeavesTheSearchForOneDoneAndEmpty) {
-  installThree();
-  const Outcome outcome = failing(
-      newPath(kAssociation), Mode::RcAndNull,
-      [this] { return getInstance(pairOf(ipAssignmentPath("first"), generalSettingPath())); }, 2);
-  EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked", kNoPath));
-  EXPECT_THAT(outcome.instances(), IsEmpty());
 }
 
 // --- From an assignment to the setting
@@ -290,25 +210,6 @@ TEST_F(GeneralOrderedComponent, NameOfAReferenceOfAnAssignmentIsAskedOfTheInstan
                   done(operation("ReferenceNames"))}),
             storyOf(outcome));
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);
-}
-
-TEST_F(GeneralOrderedComponent, FailedFetchOfSettingPathsIsToldAndLeftOpen) {
-  installOne();
-  const std::vector<Operation> all = allFrom(kAssignment);
-  for (const Operation& run : std::vector<Operation>(all.begin() + 1, all.end())) {
-    const Outcome outcome = failing(newPath(kGeneralSettingClass), Mode::RcAndNull, run, 2);
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "not done, not marked", kNoSettingPaths));
-    EXPECT_EQ(0U, handedOut(outcome.calls));
-  }
-}
-
-TEST_F(GeneralOrderedComponent, FailedFetchOfSettingsIsToldAndLeftOpen) {
-  installOne();
-  FetchHook hook;
-  hook.generalSettings = [](auto&) { return 1; };
-  const Outcome outcome = associators(kAssignment);
-  EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "not done, not marked", kNoSettings));
-  EXPECT_EQ(0U, handedOut(outcome.calls));
 }
 
 // --- From the setting to the assignments
@@ -399,88 +300,8 @@ TEST_F(GeneralOrderedComponent, NoKeyOfTheSourceIsRead) {
     for (const Operation& run : allFrom(source)) {
       const Outcome outcome = run();
       EXPECT_EQ(0U, outcome.calls.count("getKey"));
-      EXPECT_LT(0U, handedOut(outcome.calls));
+      EXPECT_LT(0U, handedOut(outcome));
     }
-  }
-}
-
-TEST_F(GeneralOrderedComponent, PathToAskWithThatCannotBeMadeIsToldAndLeftOpen) {
-  installThree();
-  const Path source = generalSettingPath();
-  for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
-    const char* code = mode == Mode::RcAndNull ? "CMPI_RC_ERR_FAILED" : "CMPI_RC_OK";
-    EXPECT_THAT(endOf(failing(
-                    newPath(kIpAssignmentClass), mode, [&] { return associators(source); }, 2)),
-                ElementsAre(code, "not done, not marked", kNoAssignmentPath));
-    EXPECT_THAT(endOf(failing(
-                    newPath(kIpAssignmentClass), mode, [&] { return associatorNames(source); }, 2)),
-                ElementsAre(code, "not done, not marked", kNoAssignmentPathForNames));
-  }
-}
-
-// --- The provider of the assignments
-
-TEST_F(GeneralOrderedComponent, MissingProviderIsShownByTheAssociationOperationsAlone) {
-  world.host().nic("eth0").install();
-  for (const Operation& run : allFrom(generalSettingPath())) {
-    const Outcome outcome = run();
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_ERR_INVALID_CLASS", "not done, not marked", kNoAssignments));
-    EXPECT_EQ(0U, handedOut(outcome.calls));
-  }
-  for (const Operation& run : instanceOperations()) {
-    EXPECT_THAT(endOf(run()), ElementsAre("CMPI_RC_OK", "done, marked", kNoAssignments));
-  }
-  for (const Operation& run : allFrom(kAssignment)) {
-    const Outcome outcome = run();
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
-    EXPECT_EQ(1U, handedOut(outcome.calls));
-  }
-}
-
-TEST_F(GeneralOrderedComponent, FailedEnumerationDeliversNothingEvenWhereItGaveSome) {
-  installThree();
-  broker.serve(kIpAssignmentClass, {objectOf(kAssignment)}).rc = CMPI_RC_ERR_NOT_FOUND;
-  for (const Operation& run : allFrom(generalSettingPath())) {
-    const Outcome outcome = run();
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_ERR_NOT_FOUND", "not done, not marked", kNoAssignments));
-    EXPECT_EQ(0U, handedOut(outcome.calls));
-  }
-  for (const Operation& run : instanceOperations()) {
-    EXPECT_THAT(endOf(run()), ElementsAre("CMPI_RC_OK", "done, marked", kNoAssignments));
-  }
-}
-
-TEST_F(GeneralOrderedComponent, NullEnumerationWithSuccessIsAnEmptyOne) {
-  installThree();
-  broker.serve(kIpAssignmentClass).nullEnumeration = true;
-  std::vector<Operation> all = instanceOperations();
-  for (const Operation& run : allFrom(generalSettingPath())) all.push_back(run);
-  for (const Operation& run : all) {
-    const Outcome outcome = run();
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
-    EXPECT_EQ(0U, handedOut(outcome.calls));
-  }
-}
-
-TEST_F(GeneralOrderedComponent, ExceptionOfTheEnumerationPasses) {
-  installThree();
-  broker.serve(kIpAssignmentClass).throws = true;
-  std::vector<Operation> all = instanceOperations();
-  for (const Operation& run : allFrom(generalSettingPath())) all.push_back(run);
-  for (const Operation& run : all) EXPECT_THROW(run(), InjectedFailure);
-}
-
-TEST_F(GeneralOrderedComponent, EnumerationThatEndsHalfWayLeavesWhatWentOutAndItsCode) {
-  installThree();
-  for (const Operation& run : allFrom(generalSettingPath())) {
-    const Outcome outcome = failing("hasNext", Mode::RcAndNull, run, 3);
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_ERR_FAILED", "done, marked"));
-    EXPECT_EQ(2U, handedOut(outcome.calls));
-  }
-  for (const Operation& run : enumerations()) {
-    const Outcome outcome = failing("hasNext", Mode::RcAndNull, run, 3);
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
-    EXPECT_EQ(2U, handedOut(outcome.calls));
   }
 }
 

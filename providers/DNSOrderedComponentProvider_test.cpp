@@ -11,28 +11,15 @@ using ::testing::SizeIs;
 const char* const kAssociation = "ZORVA_DNSOrderedComponent";
 const char* const kBuilder = "DNSOrderedComponentCMPIInstances";
 
-const char* const kNoAssignmentPath = "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.";
-const char* const kNoAssignmentPathForNames = "Create CMPIObjectPath failed for ComputerSystem.";
-const char* const kNoAssignments = "CBEnumInstanceNames Failed for the target Class";
-const char* const kNoSettingsInBuilder = "getAllDNSSettingDataCMPIObjectPaths failed";
-const char* const kNoSettingPaths = "getAllDNSSettingDataCMPIObjectPaths Failed";
-const char* const kNoSettings = "getAllDNSSettingDataCMPIInstances Failed";
-const char* const kBadSetting = "CMPIObjectPath is NULL for DNS Client";
-const char* const kNoPath = "Create CMPIObjectPath failed for                         DNSOrderedComponent.";
 const char* const kMalformed = "Invalid InstanceId";
 
 const Path kAssignment = ipAssignmentPath("Computer%eth0%ipv4");
 const Path kSetting = settingPath("Computer%eth0");
 
-class OrderedComponent : public AssociationTest {
+class OrderedComponent : public SettingAssociationTest {
  protected:
-  OrderedComponent() : AssociationTest(orderedComponent()) {}
+  OrderedComponent() : SettingAssociationTest(orderedComponent()) {}
 
-  void serveAssignments(const std::vector<std::string>& instanceIDs) {
-    std::vector<Instance> all;
-    for (const std::string& instanceID : instanceIDs) all.push_back(objectOf(ipAssignmentPath(instanceID)));
-    broker.serve(kIpAssignmentClass, all);
-  }
   void installOne() {
     world.host().nic("eth0").install();
     serveAssignments({"Computer%eth0%ipv4"});
@@ -59,29 +46,6 @@ class OrderedComponent : public AssociationTest {
                  {"newInstance(OP4)", R"(I1.setPropertyFilter(null, {"GroupComponent", "PartComponent"}))"},
                  setAll("I1", "OP3", "OP2"),
                  {builderLine("EXITING")}});
-  }
-
-  using Operation = std::function<Outcome()>;
-  std::vector<Operation> enumerations() {
-    return {[this] { return enumerateInstanceNames(); }, [this] { return enumerateInstances(); }};
-  }
-  std::vector<Operation> instanceOperations() {
-    std::vector<Operation> all = enumerations();
-    all.push_back([this] { return getInstance(pairOf(kAssignment, kSetting)); });
-    return all;
-  }
-  std::vector<Operation> allFrom(const Path& source) {
-    return {[this, source] { return associators(source); }, [this, source] { return associatorNames(source); },
-            [this, source] { return references(source); }, [this, source] { return referenceNames(source); }};
-  }
-  // All that asks the broker for assignments.
-  std::vector<Operation> allThatEnumerate() {
-    std::vector<Operation> all = instanceOperations();
-    for (const Operation& run : allFrom(kSetting)) all.push_back(run);
-    return all;
-  }
-  static std::size_t handedOut(const Calls& calls) {
-    return calls.count("returnInstance") + calls.count("returnObjectPath");
   }
 };
 
@@ -119,16 +83,6 @@ TEST_F(OrderedComponent, AssignmentsComeAsTheBrokerGivesThemEachWithTheSettingOf
   }
 }
 
-TEST_F(OrderedComponent, AssignmentStaysAsTheBrokerGaveIt) {
-  world.host().nic("eth0").install();
-  Instance served = objectOf(kAssignment);
-  served.path.host = "elsewhere";
-  broker.serve(kIpAssignmentClass, {served});
-  const Instance one = enumerateInstances().instances().at(0);
-  EXPECT_EQ("elsewhere", one["GroupComponent"].path().host);
-  EXPECT_EQ("host1", one["PartComponent"].path().host);
-}
-
 TEST_F(OrderedComponent, MatchDoesNotEndTheSearchAmongTheSettings) {
   installOne();
   FetchHook hook;
@@ -147,47 +101,9 @@ TEST_F(OrderedComponent, HostWithoutSettingsHasNoAssociation) {
   for (const Operation& run : enumerations()) {
     const Outcome outcome = run();
     EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
-    EXPECT_EQ(0U, handedOut(outcome.calls));
+    EXPECT_EQ(0U, handedOut(outcome));
     EXPECT_THAT(outcome.lines.ofCategory(under.category).ofKind(LineKind::Variable), SizeIs(2));
   }
-}
-
-TEST_F(OrderedComponent, EveryFailureOfTheBuilderEndsEmptyAndShowsNoCode) {
-  installTwo();
-  const auto expectEmpty = [this](const Outcome& outcome, const char* text) {
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked", text));
-    EXPECT_EQ(0U, handedOut(outcome.calls));
-    EXPECT_FALSE(outcome.lines.exited(kBuilder));
-  };
-  for (const Operation& run : enumerations()) {
-    for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
-      expectEmpty(failing(newPath(kIpAssignmentClass), mode, run), kNoAssignmentPath);
-      expectEmpty(failing(newPath(kAssociation), mode, run, 3), kNoPath);
-    }
-    expectEmpty(failing("enumerateInstanceNames", Mode::RcAndNull, run), kNoAssignments);
-    expectEmpty(failing("enumerateInstanceNames", Mode::SetRc, run), kNoAssignments);
-    expectEmpty(losingHandles(kSettingClass, kAssociation, run), kBadSetting);
-  }
-}
-
-TEST_F(OrderedComponent, BuilderWithoutSettingPathsMarksItsExitAsAnOperationDoes) {
-  installOne();
-  const Outcome outcome = failing(newPath(kSettingClass), Mode::RcAndNull, [this] { return enumerateInstances(); });
-  EXPECT_EQ(tell({entry(operation("EnumInstances")),
-                  {builderLine("ENTERING"), newPath(kIpAssignmentClass), "enumerateInstanceNames(OP1)",
-                   newPath(kSettingClass) + " fails: rc set and null", error(kNoSettingsInBuilder)},
-                  exitMark(kBuilder),
-                  done(operation("EnumInstances"))}),
-            storyOf(outcome));
-  EXPECT_EQ(CMPI_RC_OK, outcome.rc);
-}
-
-TEST_F(OrderedComponent, FailureOfTheBuilderLeavesTheSearchForOneDoneAndEmpty) {
-  installTwo();
-  const Outcome outcome = failing(
-      newPath(kAssociation), Mode::RcAndNull, [this] { return getInstance(pairOf(kAssignment, kSetting)); }, 2);
-  EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked", kNoPath));
-  EXPECT_THAT(outcome.instances(), IsEmpty());
 }
 
 // --- Which assignment belongs to which setting
@@ -229,7 +145,7 @@ TEST_F(OrderedComponent, TextBeforeTheLastPercentSignIsCompared) {
     const Path source = ipAssignmentPath(cut.assignment);
     for (const Operation& run : allFrom(source)) {
       const Outcome outcome = run();
-      EXPECT_EQ(pairs.size(), handedOut(outcome.calls));
+      EXPECT_EQ(pairs.size(), handedOut(outcome));
       EXPECT_EQ("done, marked", endOf(outcome).at(1));
     }
     if (cut.setting == nullptr || *cut.setting == '\0') continue;  // a path without keys is told by its class
@@ -262,7 +178,7 @@ TEST_F(OrderedComponent, AssignmentWithoutPercentSignIsComparedWholeByTheBuilder
     for (const Operation& run : allFrom(source)) {
       const Outcome outcome = run();
       EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "not done, not marked", kMalformed));
-      EXPECT_EQ(0U, handedOut(outcome.calls));
+      EXPECT_EQ(0U, handedOut(outcome));
     }
   }
 }
@@ -284,7 +200,7 @@ TEST_F(OrderedComponent, AssignmentWithoutItsKeyHasTheEmptyText) {
 TEST_F(OrderedComponent, SettingWithoutItsKeyHasTheEmptyText) {
   world.host().nic("eth0").install();
   serveAssignments({"Computer%eth0%ipv4", "%ipv4"});
-  for (const Operation& run : allFrom(Path(kSettingClass))) EXPECT_EQ(1U, handedOut(run().calls));
+  for (const Operation& run : allFrom(Path(kSettingClass))) EXPECT_EQ(1U, handedOut(run()));
 }
 
 TEST_F(OrderedComponent, SourceIsTestedOnlyOnceThereIsACandidate) {
@@ -388,25 +304,6 @@ TEST_F(OrderedComponent, InstanceIsMadeBeforeTheSourceIsTested) {
   }
 }
 
-TEST_F(OrderedComponent, FailedFetchOfSettingPathsIsToldAndLeftOpen) {
-  installTwo();
-  const std::vector<Operation> all = allFrom(kAssignment);
-  for (const Operation& run : std::vector<Operation>(all.begin() + 1, all.end())) {
-    const Outcome outcome = failing(newPath(kSettingClass), Mode::RcAndNull, run, 3);
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "not done, not marked", kNoSettingPaths));
-    EXPECT_EQ(0U, handedOut(outcome.calls));
-  }
-}
-
-TEST_F(OrderedComponent, FailedFetchOfSettingsIsToldAndLeftOpen) {
-  installOne();
-  FetchHook hook;
-  hook.settings = [](auto&) { return 1; };
-  const Outcome outcome = associators(kAssignment);
-  EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "not done, not marked", kNoSettings));
-  EXPECT_EQ(0U, handedOut(outcome.calls));
-}
-
 // --- From a setting to its assignments
 
 TEST_F(OrderedComponent, AssignmentsAreAskedForWithoutAPropertyListAndTheirPathsTellTheirKeys) {
@@ -490,92 +387,17 @@ TEST_F(OrderedComponent, PropertyListNarrowsSettingsAndNeitherAssignmentsNorRefe
   }
 }
 
-TEST_F(OrderedComponent, PathToAskWithThatCannotBeMadeIsToldAndLeftOpen) {
-  installTwo();
-  for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
-    const char* code = mode == Mode::RcAndNull ? "CMPI_RC_ERR_FAILED" : "CMPI_RC_OK";
-    EXPECT_THAT(endOf(failing(
-                    newPath(kIpAssignmentClass), mode, [this] { return associators(kSetting); }, 2)),
-                ElementsAre(code, "not done, not marked", kNoAssignmentPath));
-    EXPECT_THAT(endOf(failing(
-                    newPath(kIpAssignmentClass), mode, [this] { return associatorNames(kSetting); }, 2)),
-                ElementsAre(code, "not done, not marked", kNoAssignmentPathForNames));
-  }
-}
-
-// --- The provider of the assignments
-
-TEST_F(OrderedComponent, MissingProviderIsShownByTheAssociationOperationsAlone) {
-  world.host().nic("eth0").install();
-  for (const Operation& run : allFrom(kSetting)) {
-    const Outcome outcome = run();
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_ERR_INVALID_CLASS", "not done, not marked", kNoAssignments));
-    EXPECT_EQ(0U, handedOut(outcome.calls));
-  }
-  for (const Operation& run : instanceOperations()) {
-    EXPECT_THAT(endOf(run()), ElementsAre("CMPI_RC_OK", "done, marked", kNoAssignments));
-  }
-  for (const Operation& run : allFrom(kAssignment)) {
-    const Outcome outcome = run();
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
-    EXPECT_EQ(1U, handedOut(outcome.calls));
-  }
-}
-
-TEST_F(OrderedComponent, FailedEnumerationDeliversNothingEvenWhereItGaveSome) {
-  installOne();
-  broker.serve(kIpAssignmentClass, {objectOf(kAssignment)}).rc = CMPI_RC_ERR_NOT_FOUND;
-  for (const Operation& run : allFrom(kSetting)) {
-    const Outcome outcome = run();
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_ERR_NOT_FOUND", "not done, not marked", kNoAssignments));
-    EXPECT_EQ(0U, handedOut(outcome.calls));
-  }
-  for (const Operation& run : instanceOperations()) {
-    EXPECT_THAT(endOf(run()), ElementsAre("CMPI_RC_OK", "done, marked", kNoAssignments));
-  }
-}
-
-TEST_F(OrderedComponent, NullEnumerationWithSuccessIsAnEmptyOne) {
-  installOne();
-  broker.serve(kIpAssignmentClass).nullEnumeration = true;
-  for (const Operation& run : allThatEnumerate()) {
-    const Outcome outcome = run();
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
-    EXPECT_EQ(0U, handedOut(outcome.calls));
-  }
-}
-
-TEST_F(OrderedComponent, ExceptionOfTheEnumerationPasses) {
-  installOne();
-  broker.serve(kIpAssignmentClass).throws = true;
-  for (const Operation& run : allThatEnumerate()) EXPECT_THROW(run(), InjectedFailure);
-}
-
-TEST_F(OrderedComponent, EnumerationThatEndsHalfWayLeavesWhatWentOutAndItsCode) {
-  installTwo();
-  for (const Operation& run : allFrom(kSetting)) {
-    const Outcome outcome = failing("hasNext", Mode::RcAndNull, run, 3);
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_ERR_FAILED", "done, marked"));
-    EXPECT_EQ(1U, handedOut(outcome.calls));
-  }
-  for (const Operation& run : enumerations()) {
-    const Outcome outcome = failing("hasNext", Mode::RcAndNull, run, 3);
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
-    EXPECT_EQ(2U, handedOut(outcome.calls));
-  }
-}
-
 TEST_F(OrderedComponent, AssignmentThatTheEnumerationCannotGiveHasTheEmptyText) {
   installTwo();
   for (const Operation& run : allFrom(kSetting)) {
     const Outcome outcome = failing("getNext", Mode::RcAndNull, run, 3);
     EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_ERR_FAILED", "not done, not marked", kMalformed));
-    EXPECT_EQ(1U, handedOut(outcome.calls));
+    EXPECT_EQ(1U, handedOut(outcome));
   }
   for (const Operation& run : enumerations()) {
     const Outcome outcome = failing("getNext", Mode::RcAndNull, run, 3);
     EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
-    EXPECT_EQ(2U, handedOut(outcome.calls));
+    EXPECT_EQ(2U, handedOut(outcome));
   }
 }
 

@@ -132,4 +132,43 @@ class FetchHook {
   std::function<unsigned short(std::vector<CMPIInstance*>&)> settings;
 };
 
+// --- The fixture.
+
+class SettingAssociationTest : public AssociationTest {
+ protected:
+  using AssociationTest::AssociationTest;
+  using Operation = std::function<Outcome()>;
+
+  std::vector<Operation> enumerations() {
+    return {[this] { return enumerateInstanceNames(); }, [this] { return enumerateInstances(); }};
+  }
+  std::vector<Operation> instanceOperations(const Path& pair) {
+    std::vector<Operation> all = enumerations();
+    all.push_back([this, pair] { return getInstance(pair); });
+    return all;
+  }
+  // The four association operations.
+  std::vector<Operation> allFrom(const Path& source) {
+    return {[this, source] { return associators(source); }, [this, source] { return associatorNames(source); },
+            [this, source] { return references(source); }, [this, source] { return referenceNames(source); }};
+  }
+  // Those of them that fetch no instances, but paths, of what the factory makes.
+  std::vector<Operation> pathsFrom(const Path& source) {
+    std::vector<Operation> all = allFrom(source);
+    all.erase(all.begin());
+    return all;
+  }
+
+  void serveAssignments(const std::vector<std::string>& instanceIDs) {
+    std::vector<Instance> all;
+    for (const std::string& instanceID : instanceIDs) all.push_back(objectOf(ipAssignmentPath(instanceID)));
+    broker.serve(kIpAssignmentClass, all);
+  }
+
+  // How many objects were handed out, null ones included.
+  static std::size_t handedOut(const Outcome& outcome) {
+    return outcome.calls.count("returnInstance") + outcome.calls.count("returnObjectPath");
+  }
+};
+
 }  // namespace ZV::Test

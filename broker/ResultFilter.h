@@ -1,0 +1,69 @@
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+#include "broker/BrokerCore.h"
+#include "broker/Convert.h"
+#include "broker/Objects.h"
+#include "broker/Result.h"
+#include "broker/Scope.h"
+
+// Between a provider and who takes its results: providers return more than was asked for, and less well named.
+
+namespace zorva::broker {
+
+/// What of each instance is wanted, as Selection in Broker.h, with the names as they came.
+struct Shape {
+  bool localOnly = false;
+  bool deepInheritance = true;
+  std::optional<std::vector<std::string_view>> properties;
+};
+
+/// A receiver that takes instances with the mask of the properties that are wanted of them.
+class Taker {
+ public:
+  virtual ~Taker() = default;
+  virtual bool takeInstance(const InstanceObject& instance, const PropertyMask& wanted) = 0;
+  virtual bool takePath(const PathObject& path) = 0;
+};
+
+/// Lets pass what was asked for, each instance with the mask of its wanted properties, each name with its namespace.
+class ResultFilter : public Receiver {
+ public:
+  /// `requested`: the class that localOnly and deepInheritance are about; null where they do not apply. All that is
+  /// referred to outlives the filter.
+  ResultFilter(BrokerCore& core, Scope& scope, const Shape& shape, const ClassInfo* requested,
+               std::string_view nameSpace, Taker& taker)
+      : core_(core), scope_(scope), shape_(shape), requested_(requested), nameSpace_(nameSpace), taker_(taker) {}
+
+  const ClassInfo* within = nullptr;    ///< results are of this class or below; null: any
+  const ClassInfo* servedAs = nullptr;  ///< results belong to this class, not to one below that is served itself
+
+  /// The taker wants no more.
+  bool full() const noexcept { return full_; }
+
+  bool takeInstance(const InstanceObject& instance) override;
+  bool takePath(const PathObject& path) override;
+
+ private:
+  bool admits(const ClassInfo& info) const;
+  bool isServed(const schema::Class& declared) const;
+  bool wants(const PropertyInfo& property) const;
+  PropertyMask maskOf(const ClassInfo& info);
+
+  BrokerCore& core_;
+  Scope& scope_;
+  const Shape& shape_;
+  const ClassInfo* const requested_;
+  const std::string nameSpace_;
+  Taker& taker_;
+  bool full_ = false;
+  std::vector<std::pair<const ClassInfo*, std::vector<std::uint64_t>>> masks_;
+};
+
+}  // namespace zorva::broker
