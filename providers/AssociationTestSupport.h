@@ -146,6 +146,7 @@ inline Story newServer(const std::string& path, const std::string& instance, con
                        const std::string& filter = {}) {
   return newObjectOnSystem(path, instance, "ZORVA_RemoteServiceAccessPoint", address, filter);
 }
+
 // --- Failures that no slot can make on its own.
 
 // Paths of one class lose their handles when a path of another class is made, as if the server took its memory back too
