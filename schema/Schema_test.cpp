@@ -59,7 +59,8 @@ class BuiltInClasses : public ::testing::TestWithParam<ClassSet> {
   const std::shared_ptr<const ClassRepository> classes_ = loadBuiltInClasses(GetParam());
 };
 
-INSTANTIATE_TEST_SUITE_P(Both, BuiltInClasses, ::testing::Values(ClassSet::Profile, ClassSet::Interop));
+INSTANTIATE_TEST_SUITE_P(Both, BuiltInClasses, ::testing::Values(ClassSet::Profile, ClassSet::Interop),
+                         [](const auto& set) { return set.param == ClassSet::Profile ? "Profile" : "Interop"; });
 
 // Superclass, property names, types, keys and methods of each CIM_ class are those of the published schema.
 TEST_P(BuiltInClasses, AgreeWithTheCimSchema) {

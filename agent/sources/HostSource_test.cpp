@@ -193,11 +193,14 @@ TEST_F(HostFiles, LoopbackIsLeftOutUnlessItIsWanted) {
 TEST_F(HostFiles, WithoutSocketsTheReasonIsTold) {
   EXPECT_TRUE(succeedsInChild([this] {
     HostSource source(options_);
-    const rlimit none{0, 0};
+    rlimit before{};
+    ::getrlimit(RLIMIT_NOFILE, &before);
+    const rlimit none{0, before.rlim_max};
     ::setrlimit(RLIMIT_NOFILE, &none);
     try {
       source.read();
     } catch (const std::runtime_error& error) {
+      ::setrlimit(RLIMIT_NOFILE, &before);  // UBSan needs a descriptor to look at an object
       return std::string(error.what()) == "a netlink socket cannot be opened: Too many open files";
     }
     return false;

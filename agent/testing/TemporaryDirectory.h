@@ -1,6 +1,12 @@
 // A directory of its own for one test.
 #pragma once
 
+#include <sys/types.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cstdio>
+#include <exception>
 #include <string>
 
 namespace zorvagent::testing {
@@ -34,21 +40,25 @@ class TemporaryDirectory {
 // The whole file, or empty text.
 std::string contentsOf(const std::string& path);
 
-// Runs the work in a child process and waits for it. The work tells by its return value whether it went well; an
-// exception counts as no. False too where it is ended by a signal.
+// Starts the work in a child process. The work tells by its return value whether it went well; an exception counts as
+// no. Not to be called while the process has other threads: a child that was forked beside one may find the
+// sanitizers' allocator locked for ever.
 template <typename Work>
-bool succeedsInChild(Work work);
+pid_t startChild(Work work);
+
+// Waits for the child's end: whether it went well. False too where it was ended by a signal.
+inline bool succeeded(pid_t child);
+
+// Both.
+template <typename Work>
+bool succeedsInChild(Work work) {
+  return succeeded(startChild(work));
+}
 
 }  // namespace zorvagent::testing
 
-#include <sys/wait.h>
-#include <unistd.h>
-
-#include <cstdio>
-#include <exception>
-
 template <typename Work>
-bool zorvagent::testing::succeedsInChild(Work work) {
+pid_t zorvagent::testing::startChild(Work work) {
   const pid_t child = ::fork();
   if (child == 0) {
     bool good = false;
@@ -60,6 +70,10 @@ bool zorvagent::testing::succeedsInChild(Work work) {
     std::fflush(nullptr);
     ::_exit(good ? 0 : 1);
   }
+  return child;
+}
+
+bool zorvagent::testing::succeeded(pid_t child) {
   int status = 0;
   return child > 0 && ::waitpid(child, &status, 0) == child && WIFEXITED(status) && WEXITSTATUS(status) == 0;
 }

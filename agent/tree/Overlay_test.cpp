@@ -21,6 +21,8 @@ namespace {
 
 using namespace ZV::NodeLexicon;
 using testing::contentsOf;
+using testing::startChild;
+using testing::succeeded;
 using testing::succeedsInChild;
 using testing::TemporaryDirectory;
 using ZV::Instrumentation;
@@ -287,13 +289,10 @@ TEST_F(OverlayTest, TwoProcessesThatWriteAThousandTimesEachLoseNothing) {
     }
     return true;
   };
-  std::thread second;
-  bool secondIsGood = false;
-  second = std::thread([&] { secondIsGood = succeedsInChild([&] { return writeAll("second"); }); });
-  const bool firstIsGood = succeedsInChild([&] { return writeAll("first"); });
-  second.join();
-  EXPECT_TRUE(firstIsGood);
-  EXPECT_TRUE(secondIsGood);
+  const pid_t first = startChild([&] { return writeAll("first"); });
+  const pid_t second = startChild([&] { return writeAll("second"); });
+  EXPECT_TRUE(succeeded(first));
+  EXPECT_TRUE(succeeded(second));
   EXPECT_EQ(Overlay(shared.path()).read().size(), std::size_t{2} * kNodes);
 }
 

@@ -212,6 +212,7 @@ TEST(RecordingBroker, ServedClassFailsAsTheTestWantsIt) {
 }
 
 struct FailureCase {
+  const char* name;
   Mode mode;
   CMPIrc rc;
   bool isNull;
@@ -261,10 +262,11 @@ TEST_P(BrokerFailure, OfAPropertyThatIsSetByItsStatus) {
 }
 
 INSTANTIATE_TEST_SUITE_P(EachMode, BrokerFailure,
-                         ::testing::Values(FailureCase{Mode::SetRc, CMPI_RC_ERR_FAILED, false, true},
-                                           FailureCase{Mode::ReturnNull, CMPI_RC_OK, true, false},
-                                           FailureCase{Mode::NullHandle, CMPI_RC_OK, false, false},
-                                           FailureCase{Mode::RcAndNull, CMPI_RC_ERR_FAILED, true, false}));
+                         ::testing::Values(FailureCase{"SetRc", Mode::SetRc, CMPI_RC_ERR_FAILED, false, true},
+                                           FailureCase{"ReturnNull", Mode::ReturnNull, CMPI_RC_OK, true, false},
+                                           FailureCase{"NullHandle", Mode::NullHandle, CMPI_RC_OK, false, false},
+                                           FailureCase{"RcAndNull", Mode::RcAndNull, CMPI_RC_ERR_FAILED, true, false}),
+                         [](const auto& one) { return one.param.name; });
 
 TEST(RecordingBroker, FailingCallIsMarkedInItsLine) {
   RecordingBroker broker;
