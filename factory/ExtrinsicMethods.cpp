@@ -22,10 +22,11 @@ std::vector<std::string> textsOf(const CMPIData& data, CMPIStatus* rc) {
   std::vector<std::string> texts;
   const CMPIArray* array = isPresent(data) && (data.type & CMPI_ARRAY) != 0 ? data.value.array : nullptr;
   if (!isGood(array)) return texts;
+  // NOLINTNEXTLINE(bugprone-too-small-loop-variable): the index is 16 bits wide, and the walk ends with its range
   for (unsigned short i = 0; i < array->ft->getSize(array, rc); ++i) {
     const CMPIString* element = stringOf(array->ft->getElementAt(array, i, rc));
     if (isGood(element)) texts.push_back(textOf(element, rc));
-    if (i == 0xffff) break;  // the index is 16 bits wide
+    if (i == 0xffff) break;
   }
   return texts;
 }

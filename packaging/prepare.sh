@@ -5,6 +5,7 @@
 build_packages=(g++ cmake ninja-build pkg-config python3-minimal libspdlog-dev libfmt-dev nlohmann-json3-dev
   libtomlplusplus-dev libcli11-dev libmnl-dev libsystemd-dev)
 test_packages=(libgtest-dev libgmock-dev binutils iproute2 libxml2-utils)
+clang_packages=(clang clang-tidy)
 bench_packages=(libbenchmark-dev iproute2 python3-minimal)
 
 die() {

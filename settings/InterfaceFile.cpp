@@ -65,7 +65,8 @@ bool isRegularFile(const std::string& fileName) {
 }
 
 std::string lineOf(const std::string& key, const std::string& value) {
-  return std::string(key.c_str()) + "=" + value.c_str() + "\n";  // each ends at its first NUL
+  // Each ends at its first NUL.
+  return std::string(key.c_str()) + "=" + value.c_str() + "\n";  // NOLINT(readability-redundant-string-cstr)
 }
 
 // Replaces every line that holds the key; what appendAbsent is for, see modifyValue.
@@ -81,6 +82,7 @@ void rewrite(const std::string& fileName, const std::string& key, const std::str
     pieces.push_back(matches ? lineOf(key, value) : std::string(buffer));
     matched = matched || matches;
   }
+  if (std::ferror(in.get()) != 0) return;  // what could not be read must not be lost
   in.reset();
   if (!matched && appendAbsent) pieces.push_back(lineOf(key, value));
 

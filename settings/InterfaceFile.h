@@ -23,7 +23,7 @@ void readList(const std::string& fileName, const char* key, std::vector<std::str
 // line of a longer key and a comment included; lines longer than 511 bytes count as several. Where the key stands
 // nowhere, modifyValue appends a line for it and modifyDNSValue drops the value.
 //
-// A file that is missing, is not a regular file or cannot be opened stays as it is, without a sign. The file is
+// A file that is missing, is not a regular file or cannot be opened or read stays as it is, without a sign. The file is
 // rewritten in place, neither locked nor atomically: of two rewrites at once one may lose, and a failure in the middle
 // leaves a shortened file. modifyDNSValue returns true on every path.
 void modifyValue(std::string fileName, std::string key, std::string value);

@@ -1,0 +1,197 @@
+// Every association of a host with three interfaces and a service processor, held against a table that was written out
+// by hand: the provider library and the companions as a CIM server loads them, asked through the broker.
+#include <gmock/gmock.h>
+#include <stdlib.h>
+
+#include <filesystem>
+#include <fstream>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "broker/Broker.h"
+#include "schema/Schema.h"
+
+namespace zorva {
+namespace {
+
+using ::testing::UnorderedElementsAreArray;
+using Lines = std::vector<std::string>;
+
+constexpr const char* kTree = R"({ "system_name": "host1", "nodes": [
+  { "type": "System", "name": "system", "description": "Computer", "children": [
+    { "type": "Port", "name": "eth0", "children": [ { "type": "NetworkIPConfig", "name": "ip", "properties": {
+      "name": "eth0", "host_name": "host1", "domain_name": "example.org", "dns_suffixes": ["example.org"],
+      "dns_server_addresses": ["192.0.2.53", "2001:db8::53"], "protocol_if_type": 4097, "enabled_state": 1,
+      "addresses": [ { "address": "192.0.2.10", "prefix_length": 24, "origin": "static" },
+                     { "address": "2001:db8::10", "prefix_length": 64, "origin": "slaac" } ] } } ] },
+    { "type": "Port", "name": "eth1", "children": [ { "type": "NetworkIPConfig", "name": "ip", "properties": {
+      "name": "eth1", "host_name": "host1", "dns_server_addresses": ["192.0.2.53"], "enabled_state": 12,
+      "addresses": [ { "address": "198.51.100.7", "prefix_length": 25, "origin": "dhcp" } ] } } ] },
+    { "type": "Port", "name": "wlan0", "children": [ { "type": "NetworkIPConfig", "name": "ip", "properties": {
+      "name": "wlan0", "enabled_state": 16 } } ] } ] },
+  { "type": "System", "name": "bmc", "description": "BMC", "children": [
+    { "type": "Port", "name": "bmc0", "children": [ { "type": "NetworkIPConfig", "name": "ip", "properties": {
+      "name": "bmc0", "host_name": "bmc", "domain_name": "mgmt.example.org", "dns_server_addresses": ["192.0.2.54"],
+      "enabled_state": 1,
+      "addresses": [ { "address": "192.0.2.20", "prefix_length": 24, "origin": "static" } ] } } ] } ] } ] })";
+
+// What the associations of a class are: "left end -> right end", each end by what names it, and the further properties.
+struct Row {
+  const char* className;
+  const char* left;
+  const char* right;
+  Lines associations;
+};
+
+const Row kRows[] = {
+    // Nothing in the tree says which interface reaches which server: each is paired with each.
+    {"ZORVA_RemoteAccessAvailableToElement",
+     "Antecedent",
+     "Dependent",
+     {
+         "192.0.2.53 -> bmc0 OrderOfAccess=1",
+         "192.0.2.53 -> eth0 OrderOfAccess=1",
+         "192.0.2.53 -> eth1 OrderOfAccess=1",
+         "192.0.2.53 -> wlan0 OrderOfAccess=1",
+         "192.0.2.54 -> bmc0 OrderOfAccess=1",
+         "192.0.2.54 -> eth0 OrderOfAccess=1",
+         "192.0.2.54 -> eth1 OrderOfAccess=1",
+         "192.0.2.54 -> wlan0 OrderOfAccess=1",
+         "2001:db8::53 -> bmc0 OrderOfAccess=2",
+         "2001:db8::53 -> eth0 OrderOfAccess=2",
+         "2001:db8::53 -> eth1 OrderOfAccess=2",
+         "2001:db8::53 -> wlan0 OrderOfAccess=2",
+     }},
+    // By the whole name: the further address eth0_2 has no endpoint of its own.
+    {"ZORVA_DNSSAPSAPDependency", "Antecedent", "Dependent", {"eth0 -> eth0", "eth1 -> eth1", "bmc0 -> bmc0"}},
+    {"ZORVA_DNSHostedAccessPoint",
+     "Antecedent",
+     "Dependent",
+     {"host1 -> eth0", "host1 -> eth1", "host1 -> wlan0", "BMC:-1 -> bmc0"}},
+    // The service processor's name is not in the setting's InstanceID.
+    {"ZORVA_DNSGeneralElementSettingData",
+     "ManagedElement",
+     "SettingData",
+     {"host1 -> dnsgen1:host1 IsCurrent=1 IsDefault=1"}},
+    {"ZORVA_DNSGenEndPointElementSettingData",
+     "ManagedElement",
+     "SettingData",
+     {"bmc0 -> dnsgen1:host1 IsCurrent=1 IsDefault=1", "eth0 -> dnsgen1:host1 IsCurrent=1 IsDefault=1",
+      "eth1 -> dnsgen1:host1 IsCurrent=1 IsDefault=1", "wlan0 -> dnsgen1:host1 IsCurrent=1 IsDefault=1"}},
+    {"ZORVA_DNSEndPointElementSettingData",
+     "ManagedElement",
+     "SettingData",
+     {"bmc0 -> BMC%bmc0 IsCurrent=2 IsDefault=2", "eth0 -> Computer%eth0 IsCurrent=2 IsDefault=2",
+      "eth1 -> Computer%eth1 IsCurrent=2 IsDefault=2", "wlan0 -> Computer%wlan0 IsCurrent=2 IsDefault=2"}},
+    {"ZORVA_DNSGenOrderedComponent",
+     "GroupComponent",
+     "PartComponent",
+     {"Computer%eth0%ipv4 -> dnsgen1:host1 AssignedSequence=1",
+      "Computer%eth0%ipv6 -> dnsgen1:host1 AssignedSequence=1",
+      "Computer%eth1%ipv4 -> dnsgen1:host1 AssignedSequence=1", "BMC%bmc0%ipv4 -> dnsgen1:host1 AssignedSequence=1"}},
+    {"ZORVA_DNSOrderedComponent",
+     "GroupComponent",
+     "PartComponent",
+     {"Computer%eth0%ipv4 -> Computer%eth0 AssignedSequence=2",
+      "Computer%eth0%ipv6 -> Computer%eth0 AssignedSequence=2",
+      "Computer%eth1%ipv4 -> Computer%eth1 AssignedSequence=2", "BMC%bmc0%ipv4 -> BMC%bmc0 AssignedSequence=2"}},
+};
+
+std::string nameOf(const broker::Value* end) {
+  if (end == nullptr || !std::holds_alternative<broker::Boxed<broker::ObjectPath>>(end->scalar)) return "?";
+  const broker::ObjectPath& path = *std::get<broker::Boxed<broker::ObjectPath>>(end->scalar);
+  for (const char* key : {"InstanceID", "Name"}) {
+    if (path.key(key) != nullptr) return std::string(path.key(key)->asText());
+  }
+  return "?";
+}
+
+class AssociationTable : public ::testing::TestWithParam<Row> {
+ protected:
+  static void SetUpTestSuite() {
+    directory_ = std::filesystem::temp_directory_path() / ("zorva-associations-" + std::to_string(::getpid()));
+    std::filesystem::create_directories(directory_ / "data");
+    std::ofstream(directory_ / "tree.json") << kTree;
+    std::ofstream(directory_ / "agent.toml")
+        << "[agent]\ndata_dir = \"" << (directory_ / "data").string() << "/\"\n[tree]\nsource = \"file\"\nfile = \""
+        << (directory_ / "tree.json").string() << "\"\n[log]\ntarget = \"off\"\n";
+    ::setenv("ZORVAGENT_CONFIG", (directory_ / "agent.toml").c_str(), 1);
+    broker::BrokerOptions options;
+    options.providerDirectory = ZORVA_LIB_DIR;
+    broker_ = std::make_unique<broker::Broker>(schema::loadBuiltInClasses(schema::ClassSet::Profile), options);
+  }
+  static void TearDownTestSuite() {
+    broker_.reset();
+    std::filesystem::remove_all(directory_);
+  }
+
+  static std::string lineOf(const broker::Instance& association) {
+    std::string line = nameOf(association.property(GetParam().left));
+    line += " -> " + nameOf(association.property(GetParam().right));
+    for (const char* name : {"OrderOfAccess", "IsCurrent", "IsDefault", "AssignedSequence"}) {
+      const broker::Value* value = association.property(name);
+      if (value == nullptr || value->isNull) continue;
+      line += std::string(" ") + name + "=" + std::to_string(std::get<std::uint64_t>(value->scalar));
+    }
+    return line;
+  }
+  static std::string lineOf(const broker::ObjectPath& association) {
+    return nameOf(association.key(GetParam().left)) + " -> " + nameOf(association.key(GetParam().right));
+  }
+  static Lines pairs() {
+    Lines lines;
+    for (const std::string& line : GetParam().associations) {
+      lines.push_back(line.substr(0, line.find(' ', line.find(" -> ") + 4)));
+    }
+    return lines;
+  }
+
+  static inline std::filesystem::path directory_;
+  static inline std::unique_ptr<broker::Broker> broker_;
+};
+
+INSTANTIATE_TEST_SUITE_P(Of, AssociationTable, ::testing::ValuesIn(kRows),
+                         [](const auto& row) { return std::string(row.param.className).substr(6); });
+
+TEST_P(AssociationTable, IsWhatInstancesTell) {
+  Lines lines;
+  const broker::Status status =
+      broker_->enumerateInstances("root/cimv2", GetParam().className, {}, [&](const broker::Instance& association) {
+        lines.push_back(lineOf(association));
+        return true;
+      });
+  EXPECT_TRUE(status.ok()) << status.message;
+  EXPECT_THAT(lines, UnorderedElementsAreArray(GetParam().associations));
+}
+
+TEST_P(AssociationTable, IsWhatNamesTell) {
+  Lines lines;
+  const broker::Status status =
+      broker_->enumerateInstanceNames("root/cimv2", GetParam().className, [&](const broker::ObjectPath& association) {
+        lines.push_back(lineOf(association));
+        return true;
+      });
+  EXPECT_TRUE(status.ok()) << status.message;
+  EXPECT_THAT(lines, UnorderedElementsAreArray(pairs()));
+}
+
+// Each association is fetched by the name under which it was enumerated.
+TEST_P(AssociationTable, EachIsFoundByItsName) {
+  std::vector<broker::ObjectPath> paths;
+  broker_->enumerateInstanceNames("root/cimv2", GetParam().className, [&](const broker::ObjectPath& association) {
+    paths.push_back(association);
+    return true;
+  });
+  Lines lines;
+  for (const broker::ObjectPath& path : paths) {
+    broker::Instance association;
+    const broker::Status status = broker_->getInstance(path, {}, association);
+    EXPECT_TRUE(status.ok()) << status.message;
+    lines.push_back(lineOf(association));
+  }
+  EXPECT_THAT(lines, UnorderedElementsAreArray(GetParam().associations));
+}
+
+}  // namespace
+}  // namespace zorva
