@@ -34,10 +34,18 @@ enum class LogLevel { Debug, Info, Warning, Error };
 /// Takes one line of the broker's or, through the broker, of a provider's log.
 using LogHook = std::function<void(LogLevel level, std::string_view text)>;
 
+/// A create function (CMPI 2.0) of a provider that is part of the program: "<prefix>_Create_InstanceMI" and so on.
+struct LinkedFunction {
+  std::string name;
+  void (*function)();  ///< cast from its own type
+};
+
 struct BrokerOptions {
   ProviderRegistry registry = ProviderRegistry::builtIn();
-  std::string providerDirectory;  ///< where libraries named without "/" lie; empty: the dynamic loader's own search
-  LogHook log;                    ///< may be empty
+  std::vector<LinkedFunction> linked = {};  ///< for the entries of the registry that name no library
+  std::string providerDirectory =
+      {};            ///< where libraries named without "/" lie; empty: the dynamic loader's own search
+  LogHook log = {};  ///< may be empty
 };
 
 /// What the providers learn of the client, as entries of the CMPI context. Empty texts make no entry.

@@ -4,6 +4,24 @@
 
 namespace zorva::broker {
 
+namespace {
+
+// Of the length and a few characters: enough to tell the names of one class apart nearly always, for a look-up that is
+// made for each property that a provider sets. Names that differ in nothing else share a bucket, no more. The bit that
+// sets small letters apart from capitals is left out.
+std::size_t bucketOf(std::string_view name, std::size_t mask) noexcept {
+  constexpr unsigned char kCase = 0x20;
+  std::uint32_t hash = static_cast<std::uint32_t>(name.size());
+  if (!name.empty()) {
+    for (const std::size_t place : {std::size_t{0}, name.size() / 3, name.size() / 2, name.size() - 1}) {
+      hash = (hash ^ (static_cast<unsigned char>(name[place]) | kCase)) * 16777619U;
+    }
+  }
+  return (hash ^ hash >> 15) & mask;
+}
+
+}  // namespace
+
 ClassInfo::ClassInfo(const schema::Class& declared) : declared_(declared), nameObject_(nullptr, declared.name()) {
   const auto& all = declared.properties();
   properties_.reserve(all.size());
@@ -17,7 +35,7 @@ ClassInfo::ClassInfo(const schema::Class& declared) : declared_(declared), nameO
                                schema::hasQualifier(property->qualifiers, "EmbeddedObject");
     properties_.push_back(
         {property, &names_.back(), cmpiType(property->type, property->isArray), index, property->isKey, takesInstance});
-    std::size_t bucket = schema::nameHash(property->name) & (size - 1);
+    std::size_t bucket = bucketOf(property->name, size - 1);
     while (buckets_[bucket] != 0) bucket = (bucket + 1) & (size - 1);
     buckets_[bucket] = static_cast<std::uint16_t>(index + 1);
   }
@@ -28,9 +46,10 @@ ClassInfo::ClassInfo(const schema::Class& declared) : declared_(declared), nameO
 
 const PropertyInfo* ClassInfo::find(std::string_view name) const noexcept {
   const std::size_t mask = buckets_.size() - 1;
-  for (std::size_t bucket = schema::nameHash(name) & mask; buckets_[bucket] != 0; bucket = (bucket + 1) & mask) {
+  for (std::size_t bucket = bucketOf(name, mask); buckets_[bucket] != 0; bucket = (bucket + 1) & mask) {
     const PropertyInfo& property = properties_[buckets_[bucket] - 1U];
-    if (schema::sameName(property.name->view(), name)) return &property;
+    const std::string_view known = property.name->view();
+    if (known == name || schema::sameName(known, name)) return &property;
   }
   return nullptr;
 }

@@ -49,7 +49,9 @@ std::size_t simpleSize(CMPIType type) noexcept {
 
 CMPIrc importText(Arena& arena, const char* text, CMPIData& data) {
   if (text == nullptr) return CMPI_RC_OK;
-  data = stringData(StringObject::make(arena, text));
+  data.type = CMPI_string;
+  data.value.string = StringObject::make(arena, text);
+  data.state = CMPI_goodValue;
   return CMPI_RC_OK;
 }
 
@@ -96,7 +98,11 @@ CMPIType keptType(CMPIType type) noexcept {
 
 CMPIrc importData(Arena& arena, const CMPIValue* value, CMPIType type, CMPIData& data) {
   const CMPIType kept = keptType(type);
-  data = nullData(kept);
+  // Field by field: a whole copy of what was composed in narrow pieces a moment ago makes the processor wait, and this
+  // is done for each property that a provider sets.
+  data.type = kept;
+  data.state = CMPI_nullValue;
+  data.value.uint64 = 0;
   if (type == CMPI_null) return CMPI_RC_OK;
   if (kept == CMPI_null) return CMPI_RC_ERR_INVALID_DATA_TYPE;
   if (value == nullptr) return CMPI_RC_OK;

@@ -26,7 +26,7 @@ class ForeignTest : public ::testing::Test {
   CMPIObjectPath* thing(const char* name) { return foreign_.make(Path("t_thing").on("far").key("NAME", name)); }
   std::string shown(const void* object) { return objectText(object); }
 
-  Broker broker_{testing::testClasses(), {ProviderRegistry(), "", nullptr}};
+  Broker broker_{testing::testClasses(), {.registry = ProviderRegistry()}};
   const CMPIBroker* cmpi_ = broker_.handle();
   BrokerCore& core_ = *BrokerCore::of(cmpi_);
   Scope scope_{core_};

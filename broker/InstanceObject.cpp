@@ -162,7 +162,11 @@ void InstanceObject::set(const PropertyInfo& property, const CMPIData& data) {
     slots = more;
     capacity = grown;
   }
-  slots[count++] = {&property, data};
+  Slot& slot = slots[count++];
+  slot.property = &property;
+  slot.data.type = data.type;
+  slot.data.state = data.state;
+  slot.data.value = data.value;
   info->noteSize(count);
 }
 

@@ -54,7 +54,7 @@ class ObjectsTest : public ::testing::Test {
     return names;
   }
 
-  Broker broker_{testing::testClasses(), {ProviderRegistry(), "", nullptr}};
+  Broker broker_{testing::testClasses(), {.registry = ProviderRegistry()}};
   const CMPIBroker* cmpi_ = broker_.handle();
   Scope scope_{*BrokerCore::of(cmpi_)};
   CMPIStatus status_{CMPI_RC_OK, nullptr};

@@ -35,8 +35,9 @@ std::vector<std::string> candidates(const std::string& directory, const std::str
 
 }  // namespace
 
-ProviderLoader::ProviderLoader(BrokerCore& core, const ProviderRegistry& registry, std::string directory)
-    : core_(core), directory_(std::move(directory)) {
+ProviderLoader::ProviderLoader(BrokerCore& core, const ProviderRegistry& registry, std::string directory,
+                               std::vector<LinkedFunction> linked)
+    : core_(core), directory_(std::move(directory)), linked_(std::move(linked)) {
   for (const ProviderEntry& entry : registry.entries()) {
     auto known = std::find_if(providers_.begin(), providers_.end(), [&](const auto& provider) {
       return provider->prefix == entry.prefix && provider->library == entry.library;
@@ -54,7 +55,7 @@ ProviderLoader::~ProviderLoader() {
     bool stays = cleanUp(*provider, &Provider::instance);
     stays = cleanUp(*provider, &Provider::association) || stays;
     stays = cleanUp(*provider, &Provider::method) || stays;
-    if (stays) libraries_.at(provider->library)->stays = true;
+    if (stays && !provider->library.empty()) libraries_.at(provider->library)->stays = true;
   }
 }
 
@@ -134,18 +135,28 @@ void ProviderLoader::makeAll(Provider& provider, MiKind wanted, Status& status) 
   provider.method.store(method, std::memory_order_release);
 }
 
-template <class Mi>
-const Mi* ProviderLoader::make(const Provider& provider, const char* kind, Status& status) {
-  Library* library = open(provider.library, status);
-  if (library == nullptr) return nullptr;
-  const std::string function = provider.prefix + "_Create_" + kind;
-  using Create = Mi* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
-  const auto create = reinterpret_cast<Create>(dlsym(library->handle, function.c_str()));
-  status.rc = CMPI_RC_ERR_FAILED;
-  if (create == nullptr) {
-    status.message = "the provider library " + provider.library + " has no function " + function;
+void* ProviderLoader::findFunction(const Provider& provider, const std::string& function, Status& status) {
+  if (provider.library.empty()) {
+    for (const LinkedFunction& one : linked_) {
+      if (one.name == function) return reinterpret_cast<void*>(one.function);
+    }
+    status.message = "the program has no function " + function;
     return nullptr;
   }
+  Library* library = open(provider.library, status);
+  if (library == nullptr) return nullptr;
+  void* found = dlsym(library->handle, function.c_str());
+  if (found == nullptr) status.message = "the provider library " + provider.library + " has no function " + function;
+  return found;
+}
+
+template <class Mi>
+const Mi* ProviderLoader::make(const Provider& provider, const char* kind, Status& status) {
+  const std::string function = provider.prefix + "_Create_" + kind;
+  using Create = Mi* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
+  const auto create = reinterpret_cast<Create>(findFunction(provider, function, status));
+  status.rc = CMPI_RC_ERR_FAILED;
+  if (create == nullptr) return nullptr;
   Scope scope(core_);
   auto* context = scope.arena().make<ContextObject>(scope.arena());
   context->setText(CMPIInitNameSpace, provider.nameSpace);

@@ -19,10 +19,12 @@
 namespace zorva::broker {
 
 class BrokerCore;
+struct LinkedFunction;
 
 class ProviderLoader {
  public:
-  ProviderLoader(BrokerCore& core, const ProviderRegistry& registry, std::string directory);
+  ProviderLoader(BrokerCore& core, const ProviderRegistry& registry, std::string directory,
+                 std::vector<LinkedFunction> linked);
 
   /// Calls the cleanup of every MI that was made, then closes the libraries, save those that ask to stay.
   ~ProviderLoader();
@@ -51,6 +53,8 @@ class ProviderLoader {
 
   Provider& providerOf(const ProviderEntry& entry) const;
   Library* open(const std::string& name, Status& status);
+  /// A create function, in the program itself for a provider without library. Null with a failure.
+  void* findFunction(const Provider& provider, const std::string& function, Status& status);
   /// Makes what the provider lacks of its kinds and publishes it. `status` is that of the kind `wanted`.
   void makeAll(Provider& provider, MiKind wanted, Status& status);
   template <class Mi>
@@ -62,6 +66,7 @@ class ProviderLoader {
 
   BrokerCore& core_;
   const std::string directory_;
+  const std::vector<LinkedFunction> linked_;
   std::vector<std::unique_ptr<Provider>> providers_;
   // A create function may call up into the broker, which may need another provider.
   std::recursive_mutex mutex_;

@@ -18,9 +18,10 @@ enum MiKind : unsigned {
 /// One class and who serves it.
 struct ProviderEntry {
   std::string className;
-  std::string prefix;   ///< the create functions are <prefix>_Create_InstanceMI, _AssociationMI, _MethodMI
-  std::string library;  ///< "x" stands for libx.so.1, or else libx.so, in the provider directory; or a path with "/"
-  unsigned kinds = 0;   ///< MiKind bits
+  std::string prefix;  ///< the create functions are <prefix>_Create_InstanceMI, _AssociationMI, _MethodMI
+  /// "x" stands for libx.so.1, or else libx.so, in the provider directory; or a path with "/"; or empty: the program
+  std::string library;
+  unsigned kinds = 0;  ///< MiKind bits
   std::string nameSpace = "root/cimv2";
 };
 
@@ -47,6 +48,7 @@ class ProviderRegistry {
 
   /// In the order in which they were added.
   const std::vector<ProviderEntry>& entries() const noexcept { return entries_; }
+  const std::vector<std::string>& nameSpaces() const noexcept { return nameSpaces_; }
 
  private:
   std::vector<ProviderEntry> entries_;

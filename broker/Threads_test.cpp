@@ -24,7 +24,7 @@ namespace {
 
 class ThreadsTest : public ::testing::Test {
  protected:
-  Broker broker_{testing::testClasses(), {ProviderRegistry(), "", nullptr}};
+  Broker broker_{testing::testClasses(), {.registry = ProviderRegistry()}};
   const CMPIBroker* cmpi_ = broker_.handle();
   BrokerCore& core_ = *BrokerCore::of(cmpi_);
   const CMPIBrokerExtFT& xft_ = *cmpi_->xft;

@@ -1,8 +1,12 @@
 #include "cimxml/ElementWriter.h"
 
+#include <algorithm>
+#include <array>
 #include <charconv>
+#include <cmath>
 #include <cstdint>
 
+#include "cimxml/ClassWriter.h"
 #include "schema/Utf8.h"
 
 namespace zorva::cimxml {
@@ -16,12 +20,37 @@ bool isXmlCharacter(std::uint32_t code) noexcept {
   return code == '\t' || code == '\n' || code == '\r' || (code >= 0x20 && code != 0xFFFE && code != 0xFFFF);
 }
 
-void appendAttribute(std::string& out, std::string_view name, std::string_view value) {
-  out += ' ';
-  out += name;
-  out += "=\"";
-  appendEscaped(out, value);
-  out += '"';
+/// Bytes that mean nothing to XML and are a character each.
+constexpr std::array<bool, 256> kPlain = [] {
+  std::array<bool, 256> plain{};
+  for (std::size_t byte = 0x20; byte < 0x7F; ++byte) plain[byte] = true;
+  for (const char special : std::string_view("&<>\"")) plain[static_cast<unsigned char>(special)] = false;
+  return plain;
+}();
+
+/// What is written for a character that cannot stand as it is.
+std::string_view standIn(char character) noexcept {
+  switch (character) {
+    case '&':
+      return "&amp;";
+    case '<':
+      return "&lt;";
+    case '>':
+      return "&gt;";
+    case '"':
+      return "&quot;";
+    // A reader would turn these into blanks in an attribute, and a carriage return into a line feed anywhere.
+    case '\t':
+      return "&#9;";
+    case '\n':
+      return "&#10;";
+    case '\r':
+      return "&#13;";
+    case '\x7F':
+      return "\x7F";
+    default:
+      return kReplacement;
+  }
 }
 
 void appendUtf16Unit(std::string& out, char16_t unit) {
@@ -36,16 +65,23 @@ void appendUtf16Unit(std::string& out, char16_t unit) {
 }
 
 /// The content of a VALUE or KEYVALUE element.
-struct ContentWriter {
-  std::string& out;
+class ContentWriter {
+ public:
+  explicit ContentWriter(std::string& text) : out(text) {}
 
   void operator()(std::monostate) const {}
   void operator()(bool value) const { out += value ? "TRUE" : "FALSE"; }
-  void operator()(std::uint64_t value) const { out += std::to_string(value); }
-  void operator()(std::int64_t value) const { out += std::to_string(value); }
+  void operator()(std::uint64_t value) const { number(value); }
+  void operator()(std::int64_t value) const { number(value); }
+  /// DSP0201 5.3.1 wants a decimal point, and has words of its own for what is no number.
   void operator()(double value) const {
-    char text[32];
-    out.append(text, std::to_chars(text, text + sizeof text, value).ptr);
+    if (!std::isfinite(value)) {
+      out += std::isnan(value) ? "NaN" : value > 0 ? "INF" : "-INF";
+      return;
+    }
+    const std::size_t begin = out.size();
+    number(value);
+    if (out.find('.', begin) == std::string::npos) out.insert(std::min(out.find('e', begin), out.size()), ".0");
   }
   void operator()(char16_t value) const { appendUtf16Unit(out, value); }
   void operator()(const std::string& value) const { appendEscaped(out, value); }
@@ -56,6 +92,15 @@ struct ContentWriter {
     appendInstance(element, *value);
     appendEscaped(out, element);
   }
+
+ private:
+  template <class Number>
+  void number(Number value) const {
+    char text[32];
+    out.append(text, std::to_chars(text, text + sizeof text, value).ptr);
+  }
+
+  std::string& out;
 };
 
 void appendScalar(std::string& out, const broker::Scalar& scalar, bool isReference) {
@@ -64,7 +109,7 @@ void appendScalar(std::string& out, const broker::Scalar& scalar, bool isReferen
     return;
   }
   out += isReference ? "<VALUE.REFERENCE>" : "<VALUE>";
-  std::visit(ContentWriter{out}, scalar);
+  std::visit(ContentWriter(out), scalar);
   out += isReference ? "</VALUE.REFERENCE>" : "</VALUE>";
 }
 
@@ -84,7 +129,7 @@ void appendKeyBinding(std::string& out, const broker::NamedValue& key) {
     appendAttribute(out, "VALUETYPE", keyValueType(key.value.type));
     appendAttribute(out, "TYPE", schema::typeName(key.value.type));
     out += '>';
-    std::visit(ContentWriter{out}, key.value.scalar);
+    std::visit(ContentWriter(out), key.value.scalar);
     out += "</KEYVALUE>";
   }
   out += "</KEYBINDING>";
@@ -102,7 +147,8 @@ const char* propertyElement(const broker::Value& value) noexcept {
   return value.type == schema::Type::Reference ? "PROPERTY.REFERENCE" : "PROPERTY";
 }
 
-void appendProperty(std::string& out, const broker::Property& property, bool classOrigin) {
+void appendProperty(std::string& out, const broker::Property& property, const broker::Instance& instance,
+                    const InstanceDetail& detail) {
   const char* const element = propertyElement(property.value);
   out += '<';
   out += element;
@@ -112,11 +158,15 @@ void appendProperty(std::string& out, const broker::Property& property, bool cla
   } else if (property.declaration != nullptr) {
     appendAttribute(out, "REFERENCECLASS", property.declaration->referenceClass);
   }
-  if (classOrigin && property.declaration != nullptr && property.declaration->origin != nullptr) {
+  if (detail.classOrigin && property.declaration != nullptr && property.declaration->origin != nullptr) {
     appendAttribute(out, "CLASSORIGIN", property.declaration->origin->name());
   }
   if (holdsInstance(property.value)) appendAttribute(out, "EmbeddedObject", "instance");
   out += '>';
+  if (detail.qualifiers != nullptr && property.declaration != nullptr) {
+    const bool inherited = property.declaration->origin != instance.declaration;
+    appendQualifiers(out, property.declaration->qualifiers, inherited, *detail.qualifiers);
+  }
   appendValue(out, property.value);
   out += "</";
   out += element;
@@ -125,37 +175,36 @@ void appendProperty(std::string& out, const broker::Property& property, bool cla
 
 }  // namespace
 
+void appendAttribute(std::string& out, std::string_view name, std::string_view value) {
+  out += ' ';
+  out += name;
+  out += "=\"";
+  appendEscaped(out, value);
+  out += '"';
+}
+
 void appendEscaped(std::string& out, std::string_view text) {
-  while (!text.empty()) {
-    const std::size_t length = schema::utf8Length(text);
-    switch (text[0]) {
-      case '&':
-        out += "&amp;";
-        break;
-      case '<':
-        out += "&lt;";
-        break;
-      case '>':
-        out += "&gt;";
-        break;
-      case '"':
-        out += "&quot;";
-        break;
-      // A reader would turn these into blanks in an attribute, and a carriage return into a line feed anywhere.
-      case '\t':
-        out += "&#9;";
-        break;
-      case '\n':
-        out += "&#10;";
-        break;
-      case '\r':
-        out += "&#13;";
-        break;
-      default:
-        out += length > 0 && isXmlCharacter(schema::utf8Decode(text)) ? text.substr(0, length) : kReplacement;
+  // Nearly all text is plain: it is copied in runs, and only what ends a run is looked at by itself.
+  std::size_t begin = 0;
+  std::size_t i = 0;
+  while (i < text.size()) {
+    const auto byte = static_cast<unsigned char>(text[i]);
+    if (kPlain[byte]) {
+      ++i;
+      continue;
     }
-    text.remove_prefix(length == 0 ? 1 : length);
+    const std::string_view rest = text.substr(i);
+    const std::size_t length = byte < 0x80 ? 1 : schema::utf8Length(rest);
+    if (byte >= 0x80 && length > 0 && isXmlCharacter(schema::utf8Decode(rest))) {
+      i += length;
+      continue;
+    }
+    out.append(text, begin, i - begin);
+    out += standIn(text[i]);
+    i += length == 0 ? 1 : length;
+    begin = i;
   }
+  out.append(text, begin, text.size() - begin);
 }
 
 void appendValue(std::string& out, const broker::Value& value) {
@@ -192,26 +241,69 @@ void appendLocalNamespacePath(std::string& out, std::string_view nameSpace) {
   out += "</LOCALNAMESPACEPATH>";
 }
 
+void appendNamespacePath(std::string& out, std::string_view host, std::string_view nameSpace) {
+  out += "<NAMESPACEPATH><HOST>";
+  appendEscaped(out, host);
+  out += "</HOST>";
+  appendLocalNamespacePath(out, nameSpace);
+  out += "</NAMESPACEPATH>";
+}
+
 void appendInstancePath(std::string& out, const broker::ObjectPath& path) {
   if (path.nameSpace.empty()) {
     appendInstanceName(out, path);
-    return;
+  } else if (path.host.empty()) {
+    out += "<LOCALINSTANCEPATH>";
+    appendLocalNamespacePath(out, path.nameSpace);
+    appendInstanceName(out, path);
+    out += "</LOCALINSTANCEPATH>";
+  } else {
+    appendWholePath(out, path, path.host);
   }
-  const bool isLocal = path.host.empty();
-  out += isLocal ? "<LOCALINSTANCEPATH>" : "<INSTANCEPATH><NAMESPACEPATH><HOST>";
-  if (!isLocal) appendEscaped(out, path.host);
-  if (!isLocal) out += "</HOST>";
-  appendLocalNamespacePath(out, path.nameSpace);
-  if (!isLocal) out += "</NAMESPACEPATH>";
-  appendInstanceName(out, path);
-  out += isLocal ? "</LOCALINSTANCEPATH>" : "</INSTANCEPATH>";
 }
 
-void appendInstance(std::string& out, const broker::Instance& instance, bool classOrigin) {
+void appendWholePath(std::string& out, const broker::ObjectPath& path, std::string_view host) {
+  out += "<INSTANCEPATH>";
+  appendNamespacePath(out, path.host.empty() ? host : std::string_view(path.host), path.nameSpace);
+  appendInstanceName(out, path);
+  out += "</INSTANCEPATH>";
+}
+
+namespace {
+
+void appendParameterType(std::string& out, const broker::Value& value) {
+  const bool isReference = value.type == schema::Type::Reference;
+  appendAttribute(out, "PARAMTYPE", isReference ? "reference" : schema::typeName(value.type));
+  if (holdsInstance(value)) appendAttribute(out, "EmbeddedObject", "instance");
+}
+
+}  // namespace
+
+void appendParameter(std::string& out, const broker::NamedValue& parameter) {
+  out += "<PARAMVALUE";
+  appendAttribute(out, "NAME", parameter.name);
+  appendParameterType(out, parameter.value);
+  out += '>';
+  appendValue(out, parameter.value);
+  out += "</PARAMVALUE>";
+}
+
+void appendReturnValue(std::string& out, const broker::Value& value) {
+  out += "<RETURNVALUE";
+  appendParameterType(out, value);
+  out += '>';
+  appendValue(out, value);
+  out += "</RETURNVALUE>";
+}
+
+void appendInstance(std::string& out, const broker::Instance& instance, const InstanceDetail& detail) {
   out += "<INSTANCE";
   appendAttribute(out, "CLASSNAME", instance.path.className);
   out += '>';
-  for (const broker::Property& property : instance.properties) appendProperty(out, property, classOrigin);
+  if (detail.qualifiers != nullptr && instance.declaration != nullptr) {
+    appendQualifiers(out, instance.declaration->qualifiers(), false, *detail.qualifiers);
+  }
+  for (const broker::Property& property : instance.properties) appendProperty(out, property, instance, detail);
   out += "</INSTANCE>";
 }
 

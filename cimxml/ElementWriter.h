@@ -16,6 +16,9 @@ namespace zorva::cimxml {
 /// `text` with the characters escaped that mean something to XML, in content and in attributes in double quotes.
 void appendEscaped(std::string& out, std::string_view text);
 
+/// A blank and `name="value"`, the value escaped.
+void appendAttribute(std::string& out, std::string_view name, std::string_view value);
+
 /// VALUE, VALUE.ARRAY, VALUE.REFERENCE or VALUE.REFARRAY. Nothing at all for null.
 void appendValue(std::string& out, const broker::Value& value);
 
@@ -29,8 +32,26 @@ void appendLocalNamespacePath(std::string& out, std::string_view nameSpace);
 /// where it has none.
 void appendInstancePath(std::string& out, const broker::ObjectPath& path);
 
-/// INSTANCE with a PROPERTY, PROPERTY.ARRAY or PROPERTY.REFERENCE for each of its properties, in their order. With
-/// `classOrigin`, each has the attribute CLASSORIGIN where the property's declaration is known.
-void appendInstance(std::string& out, const broker::Instance& instance, bool classOrigin = false);
+/// NAMESPACEPATH: HOST and LOCALNAMESPACEPATH.
+void appendNamespacePath(std::string& out, std::string_view host, std::string_view nameSpace);
+
+/// INSTANCEPATH, whatever the path has: `host` stands for a host that it lacks.
+void appendWholePath(std::string& out, const broker::ObjectPath& path, std::string_view host);
+
+/// PARAMVALUE of a method's output.
+void appendParameter(std::string& out, const broker::NamedValue& parameter);
+
+/// RETURNVALUE of a method. `value` is not null.
+void appendReturnValue(std::string& out, const broker::Value& value);
+
+/// What is written of an instance beside its properties' names, types and values.
+struct InstanceDetail {
+  bool classOrigin = false;  ///< CLASSORIGIN of each property whose declaration is known
+  /// Not null: the qualifiers of class and properties, where the declaration is known; it tells the qualifiers' types.
+  const schema::ClassRepository* qualifiers = nullptr;
+};
+
+/// INSTANCE with a PROPERTY, PROPERTY.ARRAY or PROPERTY.REFERENCE for each of its properties, in their order.
+void appendInstance(std::string& out, const broker::Instance& instance, const InstanceDetail& detail = {});
 
 }  // namespace zorva::cimxml

@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cmath>
 #include <string>
 
 namespace zorva::cimxml {
@@ -36,7 +37,7 @@ std::string instanceElement(const Property& property, bool classOrigin = false) 
   instance.path.className = "C";
   instance.properties.push_back(property);
   std::string out;
-  appendInstance(out, instance, classOrigin);
+  appendInstance(out, instance, {classOrigin, nullptr});
   return out;
 }
 
@@ -53,6 +54,8 @@ TEST(XmlText, ReplacesWhatXmlCannotHold) {
             "b");
   EXPECT_EQ(escaped("\xFFz"), "\xEF\xBF\xBDz");
   EXPECT_EQ(escaped("\xEF\xBF\xBE"), "\xEF\xBF\xBD");
+  EXPECT_EQ(escaped("ab\xC3"), "ab\xEF\xBF\xBD");
+  EXPECT_EQ(escaped("a\x7F"), "a\x7F");
 }
 
 TEST(XmlText, LeavesOtherCharactersAsTheyAre) {
@@ -79,8 +82,12 @@ TEST(XmlValue, WritesEachTypeAsTheStandardSpellsIt) {
   EXPECT_EQ(elementOf(character), "<VALUE>\xEF\xBF\xBD</VALUE>");
   Value real = Value::text("");
   real.type = schema::Type::Real64;
-  real.scalar = 0.5;
-  EXPECT_EQ(elementOf(real), "<VALUE>0.5</VALUE>");
+  const std::pair<double, const char*> reals[] = {{0.5, "0.5"},        {5.0, "5.0"},      {1e300, "1.0e+300"},
+                                                  {-INFINITY, "-INF"}, {INFINITY, "INF"}, {NAN, "NaN"}};
+  for (const auto& [number, text] : reals) {
+    real.scalar = number;
+    EXPECT_EQ(elementOf(real), "<VALUE>" + std::string(text) + "</VALUE>");
+  }
 }
 
 TEST(XmlPath, SaysAsMuchAsThePathDoes) {
@@ -140,6 +147,45 @@ TEST(XmlInstance, WritesTheClassOfAReferenceAndTheOriginOfAProperty) {
   EXPECT_EQ(
       instanceElement({"P", Value::text("v"), known}, true),
       R"(<INSTANCE CLASSNAME="C"><PROPERTY NAME="P" TYPE="string" CLASSORIGIN="Base"><VALUE>v</VALUE></PROPERTY></INSTANCE>)");
+}
+
+TEST(XmlInstance, WritesTheQualifiersOfItsClassAndProperties) {
+  schema::ClassRepository classes;
+  schema::QualifierType type;
+  type.name = "Q";
+  type.scope = schema::ScopeAny;
+  ASSERT_FALSE(classes.add(type));
+  schema::ClassDeclaration base;
+  base.name = "Base";
+  base.properties.emplace_back().name = "P";
+  base.properties.back().qualifiers.emplace_back().name = "q";
+  ASSERT_FALSE(classes.add(base));
+  schema::ClassDeclaration derived;
+  derived.name = "C";
+  derived.superclass = "Base";
+  derived.qualifiers.emplace_back().name = "Q";
+  ASSERT_FALSE(classes.add(derived));
+  Instance instance;
+  instance.path.className = "C";
+  instance.declaration = classes.find("C");
+  instance.properties.push_back({"P", Value::text("v"), instance.declaration->findProperty("P")});
+  std::string out;
+  appendInstance(out, instance, {false, &classes});
+  EXPECT_EQ(
+      out,
+      R"(<INSTANCE CLASSNAME="C"><QUALIFIER NAME="Q" TYPE="boolean"><VALUE>TRUE</VALUE></QUALIFIER>)"
+      R"(<PROPERTY NAME="P" TYPE="string"><QUALIFIER NAME="Q" TYPE="boolean" PROPAGATED="true"><VALUE>TRUE</VALUE>)"
+      R"(</QUALIFIER><VALUE>v</VALUE></PROPERTY></INSTANCE>)");
+}
+
+TEST(XmlMethod, WritesWhatItGaveBack) {
+  std::string out;
+  appendReturnValue(out, Value::unsignedNumber(0, schema::Type::Uint32));
+  appendParameter(out, {"Job", Value::reference({"", "", "J", {}})});
+  appendParameter(out, {"Text", Value::null(schema::Type::String)});
+  EXPECT_EQ(out, R"(<RETURNVALUE PARAMTYPE="uint32"><VALUE>0</VALUE></RETURNVALUE><PARAMVALUE NAME="Job" )"
+                 R"(PARAMTYPE="reference"><VALUE.REFERENCE><INSTANCENAME CLASSNAME="J"></INSTANCENAME>)"
+                 R"(</VALUE.REFERENCE></PARAMVALUE><PARAMVALUE NAME="Text" PARAMTYPE="string"></PARAMVALUE>)");
 }
 
 TEST(XmlInstance, HoldsAnEmbeddedInstanceAsItsText) {

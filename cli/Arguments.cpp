@@ -2,6 +2,7 @@
 
 #include <CLI/CLI.hpp>
 #include <algorithm>
+#include <charconv>
 #include <map>
 #include <memory>
 #include <utility>
@@ -21,14 +22,126 @@ Examples:
   zorvactl ai 'ZORVA_DNSProtocolEndPoint.Name="eth0"' --result-class CIM_RemoteServiceAccessPoint
   zorvactl ifcfg init eth0                               give eth0 a file of settings
   zorvactl dns set eth0 192.0.2.53 2001:db8::53          and change them
+  zorvactl --url http://localhost:5988/root/cimv2 show   what a CIM server says
 
 A path may leave out keys where the rest is clear, and take any spelling of names. Exit status: 0 done, 1 the operation
-failed, 2 wrong usage or configuration.)";
+failed, 2 wrong usage or configuration. "zorvactl SUBCOMMAND --help" tells more.)";
+
+/// What stands at the end of a subcommand's help: how it is called, a line each.
+struct SubcommandExamples {
+  std::string_view name;
+  std::string_view lines;
+};
+
+constexpr SubcommandExamples kSubcommandExamples[] = {
+    {"show",
+     "  zorvactl show\n"
+     "  zorvactl show --output json\n"
+     "  zorvactl show --url http://localhost:5988/root/cimv2"},
+    {"tree",
+     "  zorvactl tree\n"
+     "  zorvactl tree --output json > tree.json       to be read back as [tree] source = \"file\""},
+    {"classes", "  zorvactl classes"},
+    {"graph",
+     "  zorvactl graph\n"
+     "  zorvactl graph 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"'\n"
+     "  zorvactl graph --output svg > dns.svg         needs Graphviz"},
+    {"enumerate",
+     "  zorvactl ei ZORVA_DNSProtocolEndPoint\n"
+     "  zorvactl ei ZORVA_DNSSettingData --property DomainName --property DNSServerAddresses --output json\n"
+     "  zorvactl ei CIM_SettingData                   and of all classes below it"},
+    {"names", "  zorvactl ein ZORVA_DNSSettingData"},
+    {"get",
+     "  zorvactl gi 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"'\n"
+     "  zorvactl gi 'ZORVA_DNSSettingData.InstanceID=\"Computer%eth0\"' --output mof\n"
+     "  zorvactl gi ZORVA_DNSGeneralSettingData       the only one needs no keys"},
+    {"associators",
+     "  zorvactl ai 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' --result-class CIM_RemoteServiceAccessPoint\n"
+     "  zorvactl ai 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' --assoc-class ZORVA_DNSEndPointElementSettingData"},
+    {"associator-names",
+     "  zorvactl ain 'ZORVA_DNSSettingData.InstanceID=\"Computer%eth0\"'\n"
+     "  zorvactl ain 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' --role Dependent --result-role Antecedent"},
+    {"references", "  zorvactl ri 'ZORVA_RemoteServiceAccessPoint.Name=\"192.0.2.53\"'"},
+    {"reference-names",
+     "  zorvactl rin 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' --result-class ZORVA_DNSHostedAccessPoint"},
+    {"modify",
+     "  zorvactl modify 'ZORVA_DNSSettingData.InstanceID=\"Computer%eth0\"' DomainName=lab.example.org\n"
+     "  zorvactl modify 'ZORVA_DNSSettingData.InstanceID=\"Computer%eth0\"' \\\n"
+     "    DNSServerAddresses=192.0.2.1 DNSServerAddresses=192.0.2.2\n"
+     "  zorvactl modify 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' DomainName=node.example.org --dry-run"},
+    {"invoke", "  zorvactl invoke 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' SetDNSDomain DNSDomain=x.example.org"},
+    {"ifcfg", "  zorvactl ifcfg init eth0\n  zorvactl ifcfg show eth0"},
+    {"ifcfg init",
+     "  zorvactl ifcfg init eth0 --dry-run            what it would write\n"
+     "  zorvactl ifcfg init eth0 --force              puts a new file in the old one's place"},
+    {"ifcfg show", "  zorvactl ifcfg show eth0"},
+    {"dns", "  zorvactl dns set eth0 192.0.2.53 2001:db8::53\n  zorvactl dns add eth0 192.0.2.54"},
+    {"dns show", "  zorvactl dns show eth0"},
+    {"dns set",
+     "  zorvactl dns set eth0 192.0.2.53 2001:db8::53\n"
+     "  zorvactl dns set eth0                         none at all"},
+    {"dns add", "  zorvactl dns add eth0 192.0.2.54"},
+    {"dns remove", "  zorvactl dns remove eth0 192.0.2.54"},
+    {"domain", "  zorvactl domain eth0 lab.example.org\n  zorvactl domain eth0 ''"},
+    {"suffixes", "  zorvactl suffixes set example.org example.net\n  zorvactl suffixes add lab.example.org"},
+    {"suffixes show", "  zorvactl suffixes show"},
+    {"suffixes set", "  zorvactl suffixes set example.org example.net"},
+    {"suffixes add", "  zorvactl suffixes add lab.example.org"},
+    {"suffixes remove", "  zorvactl suffixes remove lab.example.org"},
+    {"overlay", "  zorvactl overlay show\n  zorvactl overlay clear eth0"},
+    {"overlay show", "  zorvactl overlay show"},
+    {"overlay clear",
+     "  zorvactl overlay clear eth0\n"
+     "  zorvactl overlay clear                        of all interfaces"},
+    {"completion", "  source <(zorvactl completion bash)            in ~/.bashrc"},
+};
+
+/// The formats that a subcommand, or one under it, can write.
+std::vector<std::string> formatsOf(const CLI::App& subcommand) {
+  const CLI::App* top = &subcommand;
+  while (top->get_parent() != nullptr && top->get_parent()->get_parent() != nullptr) top = top->get_parent();
+  const std::string& name = top->get_name();
+  if (top->get_parent() == nullptr) return {"table", "json", "mof", "xml", "dot", "svg"};
+  if (name == "graph") return {"table", "json", "dot", "svg"};
+  for (const char* each : {"enumerate", "get", "associators", "references"}) {
+    if (name == each) return {"table", "json", "mof", "xml"};
+  }
+  if (name == "completion" || subcommand.get_name() == "clear") return {"table"};
+  return {"table", "json"};
+}
+
+/// "dns set": the words that call a subcommand.
+std::string callOf(const CLI::App& subcommand) {
+  const CLI::App* parent = subcommand.get_parent();
+  if (parent == nullptr) return {};
+  const std::string before = callOf(*parent);
+  return before + (before.empty() ? "" : " ") + subcommand.get_name();
+}
+
+void addFooter(CLI::App& subcommand) {
+  const std::string call = callOf(subcommand);
+  std::string text;
+  for (const SubcommandExamples& each : kSubcommandExamples) {
+    if (each.name == call) text += "\nExamples:\n" + std::string(each.lines) + "\n";
+  }
+  const std::vector<std::string> formats = formatsOf(subcommand);
+  if (formats.size() > 1) text += "\nIt writes " + joined(formats, ", ") + " (--output).";
+  subcommand.footer(text +
+                    "\nThe options of zorvactl itself may stand here as well: --url, --config, --log-level, "
+                    "--provider-dir.");
+}
 
 const std::map<std::string, OutputFormat> kFormats = {
     {"table", OutputFormat::Table}, {"json", OutputFormat::Json}, {"mof", OutputFormat::Mof},
     {"xml", OutputFormat::Xml},     {"dot", OutputFormat::Dot},   {"svg", OutputFormat::Svg},
 };
+
+int levelOf(const std::string& word) {
+  int level = 0;
+  const auto [end, error] = std::from_chars(word.data(), word.data() + word.size(), level);
+  if (error == std::errc() && end == word.data() + word.size() && level >= 0) return level;
+  throw CLI::ValidationError("--log-level", "'" + printable(word) + "' is no level: a number from 0 on is wanted");
+}
 
 /// Builds the tree of subcommands; each sets the command that is to run.
 class CommandLine {
@@ -52,16 +165,13 @@ class CommandLine {
   void addCompletion();
   void addPropertyOption(CLI::App* subcommand);
 
-  CLI::App app_{"The DNS client configuration of this host as CIM objects, without a server.", "zorvactl"};
+  CLI::App app_{"The DNS client configuration of this host as CIM objects; no server is needed.", "zorvactl"};
   Invocation invocation_;
 };
 
 CommandLine::CommandLine() {
   app_.require_subcommand(1);
   app_.fallthrough();
-  // What subcommands have at the end of their help: they take over what stands here when they are added.
-  app_.footer(
-      "\nThe options of zorvactl itself may stand here as well: --output, --config, --log-level, --provider-dir.");
   app_.set_version_flag("--version", std::string("zorvactl ") + ZORVA_VERSION);
   addGlobalOptions();
   addOverviews();
@@ -72,6 +182,10 @@ CommandLine::CommandLine() {
   addOverlay();
   addCompletion();
   app_.footer(kExamples);
+  for (CLI::App* subcommand : app_.get_subcommands([](CLI::App*) { return true; })) {
+    addFooter(*subcommand);
+    for (CLI::App* below : subcommand->get_subcommands([](CLI::App*) { return true; })) addFooter(*below);
+  }
 }
 
 CLI::App* CommandLine::add(CLI::App& parent, const std::string& name, const std::string& description,
@@ -99,19 +213,26 @@ void CommandLine::addGlobalOptions() {
           },
           "How to write the results: table, json, mof, xml; graph: dot, svg")
       ->type_name("FORMAT");
-  app_.add_option("--config", arguments.config,
-                  "The agent's configuration (default: $ZORVAGENT_CONFIG, else "
-                  "/etc/zorvagent/agent.toml)")
-      ->type_name("FILE");
-  app_.add_option("--log-level", arguments.logLevel,
-                  "Show log lines from this level on: 3000 flow, 4000 detail, 6000 errors")
+  CLI::Option* config = app_.add_option("--config", arguments.config,
+                                        "The agent's configuration (default: $ZORVAGENT_CONFIG, else "
+                                        "/etc/zorvagent/agent.toml)")
+                            ->type_name("FILE");
+  app_.add_option_function<std::string>(
+          "--log-level", [&arguments](const std::string& word) { arguments.logLevel = levelOf(word); },
+          "Show log lines from this level on: 3000 flow, 4000 detail, 6000 errors")
       ->type_name("N");
-  app_.add_option("--provider-dir", arguments.providerDirectory, "Where the provider libraries lie")->type_name("DIR");
+  CLI::Option* directory =
+      app_.add_option("--provider-dir", arguments.providerDirectory, "Where the provider libraries lie")
+          ->type_name("DIR");
+  app_.add_option("--url", arguments.url, "Ask this CIM server, and not the providers: http://HOST:PORT/NAMESPACE")
+      ->type_name("URL")
+      ->excludes(config)
+      ->excludes(directory);
 }
 
 void CommandLine::addPropertyOption(CLI::App* subcommand) {
   subcommand->add_option("--property", invocation_.arguments.properties, "Only this property; may be repeated")
-      ->type_name("NAME")
+      ->type_name("PROPERTY")
       ->allow_extra_args(false);
 }
 
@@ -140,7 +261,7 @@ void CommandLine::addAssociations() {
     CLI::App* subcommand = add(app_, name, description, command)->alias(alias);
     target(subcommand, "PATH", "The object path at the near end");
     subcommand->add_option("--role", arguments.role, "Only where the near end stands at this reference")
-        ->type_name("NAME");
+        ->type_name("ROLE");
     return subcommand;
   };
   for (CLI::App* subcommand :
@@ -150,7 +271,7 @@ void CommandLine::addAssociations() {
         ->type_name("CLASS");
     subcommand->add_option("--result-class", arguments.resultClass, "Only objects of this class")->type_name("CLASS");
     subcommand->add_option("--result-role", arguments.resultRole, "Only where the far end stands at this reference")
-        ->type_name("NAME");
+        ->type_name("ROLE");
   }
   for (CLI::App* subcommand : {addOne("references", "ri", "The associations of an object", showReferences),
                                addOne("reference-names", "rin", "Their names", showReferenceNames)}) {
@@ -253,6 +374,10 @@ const CLI::App* subcommandNamed(const CLI::App& at, const std::string& word) {
   return nullptr;
 }
 
+void addOnce(std::vector<std::string>& words, const std::string& word) {
+  if (std::find(words.begin(), words.end(), word) == words.end()) words.push_back(word);
+}
+
 /// What a word at a place of its own can be: a subcommand, an option, or the positional of that number.
 Completion completionAt(const CLI::App& at, std::size_t positional) {
   Completion completion;
@@ -262,13 +387,15 @@ Completion completionAt(const CLI::App& at, std::size_t positional) {
   std::vector<const CLI::Option*> positionals;
   for (const CLI::App* app = &at; app != nullptr; app = app->get_parent()) {
     for (const CLI::Option* option : app->get_options()) {
-      for (const std::string& name : option->get_lnames()) completion.words.push_back("--" + name);
+      for (const std::string& name : option->get_lnames()) addOnce(completion.words, "--" + name);
       if (option->get_positional() && app == &at) positionals.push_back(option);
     }
   }
-  if (!positionals.empty()) {
-    completion.kind = positionals[std::min(positional, positionals.size() - 1)]->get_name(true);
-  }
+  if (positionals.empty()) return completion;
+  completion.kind = positionals[std::min(positional, positionals.size() - 1)]->get_name(true);
+  if (completion.kind == "SHELL") completion.words.emplace_back("bash");
+  // Names of properties and parameters.
+  if (completion.kind == "NAME=VALUE") completion.kind = at.get_name() == "invoke" ? "PARAMETER=" : "PROPERTY=";
   return completion;
 }
 
@@ -292,6 +419,28 @@ const char* formatName(OutputFormat format) noexcept {
   return "svg";
 }
 
+namespace {
+
+/// The error in words that name the subcommand, and where its usage is told.
+Telling wrongUsage(const CLI::App& app, const CLI::ParseError& error) {
+  const CLI::App* at = &app;
+  while (!at->get_subcommands().empty()) at = at->get_subcommands().back();
+  const std::string call = "zorvactl" + (at == &app ? std::string() : " " + callOf(*at));
+  if (at->get_require_subcommand_min() == 0 || dynamic_cast<const CLI::RequiredError*>(&error) == nullptr) {
+    return {printable(error.what()), true, call + " --help shows the usage"};
+  }
+  std::vector<std::string> names;
+  for (const CLI::App* each : at->get_subcommands([](const CLI::App*) { return true; })) {
+    if (!each->get_group().empty()) names.push_back(each->get_name());
+  }
+  const std::vector<std::string> unknown = app.remaining(true);
+  return {
+      unknown.empty() ? call + " needs a subcommand" : call + " has no subcommand '" + printable(unknown.front()) + "'",
+      true, "it has " + joined(names, ", ") + "; " + call + " --help tells more"};
+}
+
+}  // namespace
+
 std::variant<Invocation, Telling> readArguments(int argc, const char* const* argv) {
   CommandLine line;
   try {
@@ -303,7 +452,7 @@ std::variant<Invocation, Telling> readArguments(int argc, const char* const* arg
   } catch (const CLI::CallForVersion& version) {
     return Telling{std::string(version.what()) + "\n"};
   } catch (const CLI::ParseError& error) {
-    return Telling{printable(error.what()), true};
+    return wrongUsage(line.app(), error);
   }
   return std::move(line.invocation());
 }
@@ -327,9 +476,7 @@ Completion completionBehind(const std::vector<std::string>& words) {
   }
   if (waiting == nullptr) return completionAt(*at, positional);
   Completion completion{{}, waiting->get_type_name()};
-  if (completion.kind == "FORMAT") {
-    for (const auto& [word, format] : kFormats) completion.words.push_back(word);
-  }
+  if (completion.kind == "FORMAT") completion.words = formatsOf(*at);
   return completion;
 }
 

@@ -21,6 +21,7 @@ struct Arguments {
   std::string config;             ///< the agent's configuration; empty: as the environment says
   std::optional<int> logLevel;    ///< lines below it are dropped; absent: as the configuration says
   std::string providerDirectory;  ///< empty: beside this program
+  std::string url;                ///< of the CIM server to ask; empty: the providers, in this process
 
   std::string target;               ///< a class, an object path, an interface, a shell
   std::string method;               ///< of invoke
@@ -50,6 +51,7 @@ struct Invocation {
 struct Telling {
   std::string text;
   bool isError = false;
+  std::string hint = {};  ///< of an error: what to do next
 };
 
 /// Reads the command line. The only part of the program that knows the options.
@@ -58,7 +60,9 @@ std::variant<Invocation, Telling> readArguments(int argc, const char* const* arg
 /// What can stand at a place of the command line.
 struct Completion {
   std::vector<std::string> words;  ///< subcommands, options, or the values of an option
-  std::string kind;  ///< what else can: "CLASS", "PATH", "INTERFACE", "FILE"; empty: nothing that is known
+  /// What else can: "CLASS", "PATH", "INTERFACE", "METHOD", "PROPERTY", "ROLE", and with a "=" behind them "PROPERTY="
+  /// and "PARAMETER="; of others there is no list.
+  std::string kind;
 };
 
 /// What can stand behind these words.

@@ -5,9 +5,12 @@
 
 #include <algorithm>
 
+#include "agent/testing/TemporaryDirectory.h"
+
 namespace zorva::cli {
 namespace {
 
+using testing::AllOf;
 using testing::Contains;
 using testing::ElementsAre;
 using testing::HasSubstr;
@@ -124,6 +127,65 @@ TEST(Completion, KnowsWhatAPlaceWants) {
 }
 
 TEST(Completion, OffersTheFormats) { EXPECT_THAT(completionBehind({"--output"}).words, Contains("json")); }
+
+TEST(CommandLine, NamesTheSubcommandThatIsNot) {
+  EXPECT_EQ(tellingOf({"frob"}).text, "zorvactl has no subcommand 'frob'");
+  EXPECT_THAT(tellingOf({"frob"}).hint, HasSubstr("it has show, tree, "));
+  EXPECT_EQ(tellingOf({"dns", "fr\x1Bob"}).text, "zorvactl dns has no subcommand 'fr\\x1Bob'");
+  EXPECT_EQ(tellingOf({"dns"}).text, "zorvactl dns needs a subcommand");
+  EXPECT_EQ(tellingOf({"dns"}).hint, "it has show, set, add, remove; zorvactl dns --help tells more");
+  EXPECT_EQ(tellingOf({"ei"}).hint, "zorvactl enumerate --help shows the usage");
+}
+
+TEST(CommandLine, WantsALevelThatIsANumber) {
+  for (const char* word : {"x", "-1", "3000x", "", "99999999999"}) {
+    EXPECT_THAT(tellingOf({"show", "--log-level", word}).text, HasSubstr("is no level")) << word;
+  }
+}
+
+TEST(CommandLine, TakesAServerOrWhatConcernsThisHost) {
+  EXPECT_EQ(argumentsOf({"show", "--url", "http://h"}).url, "http://h");
+  EXPECT_TRUE(tellingOf({"show", "--url", "http://h", "--provider-dir", "d"}).isError);
+  EXPECT_TRUE(tellingOf({"show", "--url", "http://h", "--config", "f"}).isError);
+}
+
+/// What can stand behind these words: subcommands, or else options.
+std::vector<std::string> subcommandsBehind(const std::vector<std::string>& words) {
+  std::vector<std::string> found = completionBehind(words).words;
+  std::erase_if(found, [](const std::string& word) { return word.starts_with("-") || word == "bash"; });
+  return found;
+}
+
+/// "show", "dns", "dns set": every way to call the program.
+std::vector<std::vector<std::string>> calls() {
+  std::vector<std::vector<std::string>> all;
+  for (const std::string& subcommand : subcommandsBehind({})) {
+    all.push_back({subcommand});
+    for (const std::string& below : subcommandsBehind({subcommand})) all.push_back({subcommand, below});
+  }
+  return all;
+}
+
+TEST(ManualPage, HasEverySubcommandAndOption) {
+  std::string page = zorvagent::testing::contentsOf(ZORVA_SOURCE_DIR "/cli/zorvactl.1");
+  for (std::size_t at = page.find("\\-"); at != std::string::npos; at = page.find("\\-")) page.replace(at, 2, "-");
+  EXPECT_EQ(calls().size(), 31U);
+  for (const std::vector<std::string>& call : calls()) {
+    EXPECT_THAT(page, testing::ContainsRegex("[ \"]" + call.back() + "[ \"\n]")) << call.front();
+    for (const std::string& word : completionBehind(call).words) EXPECT_THAT(page, HasSubstr(word)) << call.back();
+  }
+}
+
+TEST(Help, OfEverySubcommandHasAnExample) {
+  for (const std::vector<std::string>& call : calls()) {
+    std::vector<const char*> words;
+    for (const std::string& word : call) words.push_back(word.c_str());
+    words.push_back("--help");
+    const Telling help = tellingOf(words);
+    EXPECT_FALSE(help.isError);
+    EXPECT_THAT(help.text, AllOf(HasSubstr("\nExamples:\n  "), HasSubstr("zorvactl "))) << call.back();
+  }
+}
 
 }  // namespace
 }  // namespace zorva::cli

@@ -71,6 +71,7 @@ std::optional<std::string> missingPlace(const SettingFile& file, const std::stri
 std::vector<std::string> foreseenProblems(const Session& session, const broker::Instance& instance,
                                           const std::vector<broker::Property>& changes) {
   std::vector<std::string> problems(changes.size());
+  if (session.isRemote()) return problems;
   for (std::size_t i = 0; i < changes.size(); ++i) {
     const FileSetting* setting = fileSetting(instance, changes[i].name);
     if (setting == nullptr) continue;
@@ -87,8 +88,15 @@ std::vector<std::string> foreseenProblems(const Session& session, const broker::
 }
 
 /// Why a change did not take effect although nothing was foreseen.
-std::string unforeseenProblem(const broker::Instance& instance, const broker::Property& change) {
+std::string unforeseenProblem(const Session& session, const broker::Instance& instance,
+                              const broker::Property& change) {
   if (change.value.isNull) return "null leaves the value as it is; " + change.name + "= empties it";
+  if (session.isRemote()) {
+    const FileSetting* setting = fileSetting(instance, change.name);
+    if (setting == nullptr) return "the server took it and still says otherwise";
+    return std::string("the interface's file of settings there is missing, or has no line ") + setting->key +
+           "=; 'zorvactl ifcfg init', run on that host, makes it, then repeat this";
+  }
   if (fileSetting(instance, change.name) != nullptr) {
     return "the file cannot be written, or does not hold the value as it was given";
   }
@@ -119,20 +127,20 @@ broker::Instance instanceToSend(const broker::Instance& found, const std::vector
 
 broker::Instance fetched(Session& session, const broker::ObjectPath& path) {
   broker::Instance instance;
-  const broker::Status status = session.broker().getInstance(path, {}, instance);
+  const broker::Status status = session.cim().getInstance(path, {}, instance);
   if (!status.ok()) {
     throw operationFailure(shortPathText(path), status, "zorvactl names " + path.className + " lists what there is");
   }
   return instance;
 }
 
-void warnOfLostChanges(const broker::Instance& now, const std::vector<broker::Property>& changes,
-                       const std::vector<std::string>& foreseen) {
+void warnOfLostChanges(const Session& session, const broker::Instance& now,
+                       const std::vector<broker::Property>& changes, const std::vector<std::string>& foreseen) {
   for (std::size_t i = 0; i < changes.size(); ++i) {
     const bool isThere = sameEffect(changes[i].value, now.property(changes[i].name));
     if (foreseen[i].empty() && isThere) continue;
-    tellWarning(changes[i].name +
-                " was not stored: " + (foreseen[i].empty() ? unforeseenProblem(now, changes[i]) : foreseen[i]));
+    tellWarning(changes[i].name + " was not stored: " +
+                (foreseen[i].empty() ? unforeseenProblem(session, now, changes[i]) : foreseen[i]));
   }
 }
 
@@ -154,13 +162,15 @@ broker::Instance changeInstance(Session& session, const broker::ObjectPath& path
     propertyList.emplace();
     for (const broker::Property& change : changes) propertyList->push_back(change.name);
   }
-  const broker::Status status = session.broker().modifyInstance(sent, propertyList);
+  const broker::Status status = session.cim().modifyInstance(sent, propertyList);
   if (!status.ok()) {
     throw operationFailure("modifying " + shortPathText(found.path), status,
-                           status.rc == 4 ? "a host or domain name may hold letters, digits, '-', '_' and '.'" : "");
+                           status.rc == 4 ? "a host or domain name may hold letters, digits, '-', '_' and '.'; what "
+                                            "else was to be changed may be stored already: zorvactl get shows it"
+                                          : "");
   }
   broker::Instance now = fetched(session, found.path);
-  warnOfLostChanges(now, changes, foreseen);
+  warnOfLostChanges(session, now, changes, foreseen);
   return now;
 }
 

@@ -55,6 +55,16 @@ broker::NamedValue parseParameter(const schema::ClassMethod& method, const Assig
                 names.empty() ? "it has none" : "it has " + joined(names, ", "));
 }
 
+/// "SetDNSDomain takes DNSDomain (string)".
+std::string parametersOf(const schema::ClassMethod& method) {
+  std::vector<std::string> parameters;
+  for (const schema::Parameter& each : method.parameters) {
+    parameters.push_back(each.name + " (" + std::string(schema::typeName(each.type)) +
+                         (each.isArray ? ", repeated" : "") + ")");
+  }
+  return method.name + " takes " + (parameters.empty() ? "no parameters" : joined(parameters, ", "));
+}
+
 std::string methodTable(const broker::MethodResult& result, const Layout& layout) {
   Table table;
   table.add({"ReturnValue", valueText(result.returnValue, nullptr)});
@@ -92,8 +102,8 @@ void invokeMethod(const Arguments& arguments) {
   for (const Assignment& assignment : assignments) input.push_back(parseParameter(method, assignment));
 
   broker::MethodResult result;
-  requireDone(method.name + " of " + shortPathText(path),
-              session.broker().invokeMethod(path, method.name, input, result));
+  const broker::Status status = session.cim().invokeMethod(path, method.name, input, result);
+  if (!status.ok()) throw operationFailure(method.name + " of " + shortPathText(path), status, parametersOf(method));
   write(arguments.output == OutputFormat::Json ? methodResultJson(result) + "\n"
                                                : methodTable(result, session.layout()));
   if (path.className == kEndpointClass) {

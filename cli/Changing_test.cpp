@@ -371,6 +371,11 @@ TEST(Invoke, NamesTheMethodsAndParametersThereAre) {
   expectRefused(TestHost(), {"cm", kEndpoint, "SetDNSDomain", "DNSDomain=a", "DNSDomain=b"}, 2, "takes one value");
 }
 
+TEST(Invoke, SaysWhatTheMethodTakesWhereItRefuses) {
+  expectRefused(TestHost(), {"cm", kEndpoint, "SetDNSServerSearchOrder"}, 1,
+                "\nzorvactl: SetDNSServerSearchOrder takes DNSServerSearchOrder (string, repeated)");
+}
+
 TEST(Invoke, GivesJson) {
   EXPECT_EQ(json::parse(TestHost().run({"cm", kEndpoint, "SetDNSDomain", "DNSDomain=x", "-o", "json"}).out),
             json::parse(R"({"return_value": 0, "output": {}})"));

@@ -4,11 +4,14 @@
 
 namespace zorva::cli {
 
-Failure operationFailure(std::string_view operation, const broker::Status& status, std::string hint) {
-  std::string text =
-      printable(operation) + ": " + std::string(broker::statusName(status.rc)) + " (" + std::to_string(status.rc) + ")";
+std::string statusText(const broker::Status& status) {
+  std::string text = std::string(broker::statusName(status.rc)) + " (" + std::to_string(status.rc) + ")";
   if (!status.message.empty()) text += ": " + printable(status.message);
-  return {ExitCode::Failed, text, std::move(hint)};
+  return text;
+}
+
+Failure operationFailure(std::string_view operation, const broker::Status& status, std::string hint) {
+  return {ExitCode::Failed, printable(operation) + ": " + statusText(status), std::move(hint)};
 }
 
 void requireDone(std::string_view operation, const broker::Status& status) {

@@ -29,6 +29,9 @@ class Failure : public std::runtime_error {
   std::string hint_;
 };
 
+/// "CIM_ERR_NOT_FOUND (6): no such instance": the code with its name, and the text of who answered, made printable.
+std::string statusText(const broker::Status& status);
+
 /// The failure of a CIM operation: what was tried, the code with its name, the provider's or broker's text.
 Failure operationFailure(std::string_view operation, const broker::Status& status, std::string hint = {});
 

@@ -6,6 +6,7 @@
 #include <unordered_map>
 
 #include "cli/Failure.h"
+#include "cli/HostView.h"
 #include "cli/Text.h"
 #include "cli/ValueText.h"
 #include "schema/Names.h"
@@ -38,7 +39,11 @@ class Walk {
     }
   }
 
-  Graph take() { return std::move(graph_); }
+  Graph take() {
+    graph_.isWhole = problems_.empty();
+    for (const Problem& problem : problems_) tellWarning("associations of " + problemText(problem));
+    return std::move(graph_);
+  }
 
  private:
   std::size_t placeOf(const broker::ObjectPath& path) {
@@ -55,19 +60,19 @@ class Walk {
     broker::Instance instance;
     broker::Selection keysOnly;
     keysOnly.propertyList.emplace();
-    const broker::Status status = session_.broker().getInstance(path, keysOnly, instance);
+    const broker::Status status = session_.cim().getInstance(path, keysOnly, instance);
     return status.ok() ? std::string() : operationFailure("GetInstance", status).what();
   }
 
   void follow(std::size_t object) {
     const broker::ObjectPath path = graph_.objects[object].path;
     std::vector<broker::Instance> found;
-    const broker::Status status = session_.broker().references(path, {}, {}, [&found](const broker::Instance& each) {
+    const broker::Status status = session_.cim().references(path, {}, {}, [&found](const broker::Instance& each) {
       found.push_back(each);
       return true;
     });
     // Results may have come before a failure; what is missing then is told.
-    if (!status.ok()) tellWarning(operationFailure("references of " + shortPathText(path), status).what());
+    if (!status.ok()) addProblem(problems_, objectLabel(path), statusText(status));
     for (const broker::Instance& association : found) add(association);
   }
 
@@ -87,6 +92,7 @@ class Walk {
 
   Session& session_;
   Graph graph_;
+  std::vector<Problem> problems_;
   std::unordered_map<std::string, std::size_t> places_;
   std::set<std::string> known_;
   std::deque<std::size_t> open_;
@@ -222,17 +228,24 @@ std::vector<broker::ObjectPath> allObjects(Session& session) {
   const Session::Quiet quiet(session);
   std::vector<broker::ObjectPath> systems;
   std::vector<broker::ObjectPath> others;
-  for (const broker::ProviderEntry& entry : session.broker().registry().entries()) {
+  std::vector<Problem> problems;
+  bool couldAsk = false;
+  for (const broker::ProviderEntry& entry : session.cim().served()) {
     const schema::Class& declared = session.classNamed(entry.className);
     if (declared.isAssociation()) continue;
     std::vector<broker::ObjectPath>& paths = declared.isA("CIM_System") ? systems : others;
     const broker::Status status =
-        session.broker().enumerateInstanceNames(entry.nameSpace, entry.className, [&](const broker::ObjectPath& path) {
+        session.cim().enumerateInstanceNames({}, entry.className, [&](const broker::ObjectPath& path) {
           if (path.className == entry.className) paths.push_back(path);
           return true;
         });
-    if (!status.ok()) tellWarning(operationFailure("enumerating the names of " + entry.className, status).what());
+    couldAsk = couldAsk || status.ok();
+    if (!status.ok()) addProblem(problems, entry.className, statusText(status));
   }
+  if (!couldAsk && !problems.empty()) {
+    throw Failure(ExitCode::Failed, "no class could be asked: " + problemText(problems.front()));
+  }
+  for (const Problem& problem : problems) tellWarning(problemText(problem));
   systems.insert(systems.end(), others.begin(), others.end());
   return systems;
 }
@@ -263,7 +276,10 @@ std::string graphText(const Graph& graph, const Layout& layout) {
   out +=
       "\n" + counted(graph.objects.size(), "object") + ", " + counted(graph.associations.size(), "association") + "\n";
   const std::vector<std::string> dangling = danglingReferences(graph);
-  if (dangling.empty()) return out + "Every reference leads to an object.\n";
+  if (dangling.empty()) {
+    return out + (graph.isWhole ? "Every reference leads to an object.\n"
+                                : "Every reference that could be asked for leads to an object.\n");
+  }
   out += "\n" + styled("References whose far end cannot be fetched:", Style::Heading, layout) + "\n";
   for (const std::string& line : dangling) out += "  " + line + "\n";
   return out;

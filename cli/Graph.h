@@ -32,14 +32,15 @@ struct GraphObject {
 struct Graph {
   std::vector<GraphObject> objects;  ///< in the order in which they were found
   std::vector<GraphAssociation> associations;
+  bool isWhole = true;  ///< false: some object's associations could not be asked for
 };
 
 /// Walks from these objects along references to all that they lead to. Every object that a reference names is fetched
-/// once, to see whether it is there.
+/// once, to see whether it is there. Tells on stderr whose associations cannot be asked for.
 Graph walkGraph(Session& session, const std::vector<broker::ObjectPath>& roots);
 
 /// The names of all instances of all classes that are no associations, computer systems first. A class whose provider
-/// cannot be asked is passed over with a warning.
+/// cannot be asked is passed over with a warning; throws Failure where that is so of all.
 std::vector<broker::ObjectPath> allObjects(Session& session);
 
 /// A line for each association with an end that cannot be fetched: the association, the role, the path and why.

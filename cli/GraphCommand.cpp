@@ -77,6 +77,7 @@ void showGraph(const Arguments& arguments) {
   requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json, OutputFormat::Dot, OutputFormat::Svg},
                 "graph");
   Session session(arguments);
+  const Session::Quiet quiet(session);
   const std::vector<broker::ObjectPath> roots =
       arguments.target.empty() ? allObjects(session)
                                : std::vector<broker::ObjectPath>{resolvePath(session, arguments.target)};

@@ -49,33 +49,54 @@ bool fileStands(const std::string& interface) {
   return ::stat((zorvagent::dataDirectory() + "ifcfg-" + interface).c_str(), &status) == 0;
 }
 
-/// The file alone decides: where it stands, a key that it lacks is an empty value and not the host's.
-SettingSource sourceOf(const std::string& interface, bool hasHostValue, bool hasValue) {
-  if (fileStands(interface)) return SettingSource::File;
-  return hasHostValue && hasValue ? SettingSource::Host : SettingSource::None;
-}
-
-/// A setting that the providers read from a file or the host. ConfigurationName has no place on the host but the file.
+/// A setting that the providers read from a file or the host.
 struct SettingName {
   const char* property;
   bool isList;
-  bool hasHostValue;
+  zorvagent::PropertyNumber number;  ///< of the host's value; kNoNumber: it has no place but the file
 };
 
+constexpr zorvagent::PropertyNumber kNoNumber = 0;
+
 constexpr SettingName kInterfaceSettings[] = {
-    {"RequestedHostname", false, true},
-    {"DomainName", false, true},
-    {"DNSServerAddresses", true, true},
-    {"ConfigurationName", false, false},
+    {"RequestedHostname", false, ZV::NodeLexicon::PROP_HOST_NAME},
+    {"DomainName", false, ZV::NodeLexicon::PROP_DOMAIN_NAME},
+    {"DNSServerAddresses", true, ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES},
+    {"ConfigurationName", false, kNoNumber},
 };
 constexpr SettingName kHostSettings[] = {
-    {"DNSSuffixesToAppend", true, true},
-    {"ConfigurationName", false, false},
+    {"DNSSuffixesToAppend", true, ZV::NodeLexicon::PROP_DNS_SUFFIXES},
+    {"ConfigurationName", false, kNoNumber},
 };
+
+/// Where the settings of an interface come from.
+struct Origin {
+  std::string interface;
+  const zorvagent::Node* node = nullptr;  ///< null: it is not in the tree
+};
+
+/// The file alone decides: where it stands, a key that it lacks is an empty value and not the host's.
+SettingSource sourceOf(const Origin& origin, zorvagent::PropertyNumber number, bool hasValue) {
+  if (fileStands(origin.interface)) return SettingSource::File;
+  if (number == kNoNumber || !hasValue) return SettingSource::None;
+  const zorvagent::Property* property = origin.node == nullptr ? nullptr : origin.node->find(number);
+  return property != nullptr && property->overlaid ? SettingSource::Set : SettingSource::Host;
+}
+
+/// The configuration of that name, in the service processor or outside it.
+const zorvagent::Node* configuration(const zorvagent::TreeSnapshot& tree, const std::string& interface,
+                                     bool isServiceProcessor) {
+  for (const zorvagent::Node& node : tree.nodes()) {
+    const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
+    if (node.type() != zorvagent::NodeType::NetworkIPConfig || name == nullptr || *name != interface) continue;
+    if ((tree.parent(tree.parent(node)).description() == "BMC") == isServiceProcessor) return &node;
+  }
+  return nullptr;
+}
 
 template <std::size_t Size>
 void addSettings(std::vector<SettingRow>& rows, const SettingName (&names)[Size], const broker::Instance& instance,
-                 const std::string& interface) {
+                 const Origin* origin, const std::string& interface) {
   for (const SettingName& name : names) {
     SettingRow row;
     row.interface = interface;
@@ -83,19 +104,20 @@ void addSettings(std::vector<SettingRow>& rows, const SettingName (&names)[Size]
     row.isList = name.isList;
     const broker::Value* value = instance.property(name.property);
     if (value != nullptr) row.values = textsOf(*value);
-    row.source = sourceOf(interface, name.hasHostValue, value != nullptr && !value->isNull);
+    if (origin != nullptr) row.source = sourceOf(*origin, name.number, value != nullptr && !value->isNull);
     rows.push_back(std::move(row));
   }
 }
 
-/// The instances of a class, or none and a line that tells why.
+/// The instances of a class, as far as they can be had; where they cannot, the view tells why.
 std::vector<broker::Instance> askedFor(Session& session, const char* className, HostView& view) {
-  try {
-    return instancesOf(session, className);
-  } catch (const Failure& failure) {
-    view.problems.emplace_back(failure.what());
-    return {};
-  }
+  std::vector<broker::Instance> instances;
+  const broker::Status status = session.cim().enumerateInstances({}, className, {}, [&](const broker::Instance& each) {
+    instances.push_back(each);
+    return true;
+  });
+  if (!status.ok()) addProblem(view.problems, className, statusText(status));
+  return instances;
 }
 
 void readServers(Session& session, HostView& view) {
@@ -107,13 +129,31 @@ void readServers(Session& session, HostView& view) {
 }
 
 void readSettings(Session& session, HostView& view) {
+  const auto tree = session.isRemote() ? nullptr : session.tree();
   for (const broker::Instance& instance : askedFor(session, kSettingClass, view)) {
-    addSettings(view.interfaceSettings, kInterfaceSettings, instance, interfaceOfSetting(instance));
+    Origin origin{interfaceOfSetting(instance)};
+    const bool isServiceProcessor = propertyText(instance, "InstanceID").starts_with("BMC%");
+    if (tree != nullptr) origin.node = configuration(*tree, origin.interface, isServiceProcessor);
+    addSettings(view.interfaceSettings, kInterfaceSettings, instance, tree == nullptr ? nullptr : &origin,
+                origin.interface);
   }
-  const std::string general = interfaceOfHostSettings(session).value_or("");
+  Origin general{interfaceOfHostSettings(session).value_or("")};
+  if (tree != nullptr) general.node = configuration(*tree, general.interface, false);
   for (const broker::Instance& instance : askedFor(session, kGeneralSettingClass, view)) {
-    addSettings(view.hostSettings, kHostSettings, instance, general);
+    addSettings(view.hostSettings, kHostSettings, instance, tree == nullptr ? nullptr : &general, general.interface);
   }
+}
+
+/// A server's host is what its computer systems say, the host itself first and not its service processor.
+std::string systemNameOf(Session& session, HostView& view) {
+  if (!session.isRemote()) {
+    const std::string& configured = zorvagent::currentConfig().systemName;
+    return configured.empty() ? session.tree()->systemName() : configured;
+  }
+  for (const broker::Instance& instance : askedFor(session, kSystemClass, view)) {
+    if (instance.path.className == kSystemClass) return propertyText(instance, "Name");
+  }
+  return session.url();
 }
 
 }  // namespace
@@ -124,6 +164,8 @@ const char* sourceName(SettingSource source) noexcept {
       return "file";
     case SettingSource::Host:
       return "host";
+    case SettingSource::Set:
+      return "set";
     case SettingSource::None:
       break;
   }
@@ -137,6 +179,7 @@ std::string interfaceOfSetting(const broker::Instance& setting) {
 }
 
 std::optional<std::string> interfaceOfHostSettings(const Session& session) {
+  if (session.isRemote()) return std::nullopt;
   const auto tree = session.tree();
   for (const zorvagent::Node& node : tree->nodes()) {
     if (node.type() != zorvagent::NodeType::NetworkIPConfig) continue;
@@ -149,7 +192,7 @@ std::optional<std::string> interfaceOfHostSettings(const Session& session) {
 
 std::vector<broker::Instance> instancesOf(Session& session, std::string_view className) {
   std::vector<broker::Instance> instances;
-  requireDone(className, session.broker().enumerateInstances({}, className, {}, [&](const broker::Instance& instance) {
+  requireDone(className, session.cim().enumerateInstances({}, className, {}, [&](const broker::Instance& instance) {
     instances.push_back(instance);
     return true;
   }));
@@ -159,36 +202,72 @@ std::vector<broker::Instance> instancesOf(Session& session, std::string_view cla
 std::vector<ClassRow> readClassRows(Session& session) {
   const Session::Quiet quiet(session);
   std::vector<ClassRow> rows;
-  for (const broker::ProviderEntry& entry : session.broker().registry().entries()) {
-    ClassRow row{entry.className, entry.prefix, entry.library, std::nullopt, {}};
+  for (const broker::ProviderEntry& entry : session.cim().served()) {
+    ClassRow row{entry.className, {}, {}, std::nullopt, {}};
+    if (!session.isRemote()) {
+      row.provider = entry.prefix;
+      row.library = entry.library;
+    }
     std::uint64_t count = 0;
     // Instances of subclasses are counted at their own class.
     const broker::Status status =
-        session.broker().enumerateInstanceNames(entry.nameSpace, entry.className, [&](const broker::ObjectPath& path) {
+        session.cim().enumerateInstanceNames({}, entry.className, [&](const broker::ObjectPath& path) {
           count += path.className == entry.className ? 1 : 0;
           return true;
         });
     if (status.ok()) {
       row.count = count;
     } else {
-      row.problem = operationFailure(entry.className, status).what();
+      row.problem = statusText(status);
     }
     rows.push_back(std::move(row));
   }
   return rows;
 }
 
+bool HostView::couldAsk(std::string_view className) const {
+  return std::none_of(problems.begin(), problems.end(), [className](const Problem& each) {
+    return std::find(each.names.begin(), each.names.end(), className) != each.names.end();
+  });
+}
+
+void addProblem(std::vector<Problem>& problems, const std::string& name, const std::string& what) {
+  auto same =
+      std::find_if(problems.begin(), problems.end(), [&what](const Problem& each) { return each.what == what; });
+  if (same == problems.end()) same = problems.insert(same, {{}, what});
+  if (std::find(same->names.begin(), same->names.end(), name) == same->names.end()) same->names.push_back(name);
+}
+
+std::vector<Problem> problemsOf(const std::vector<ClassRow>& rows) {
+  std::vector<Problem> problems;
+  for (const ClassRow& row : rows) {
+    if (!row.problem.empty()) addProblem(problems, row.name, row.problem);
+  }
+  return problems;
+}
+
+std::string problemText(const Problem& problem) {
+  constexpr std::size_t kShownNames = 20;
+  const std::size_t shown = std::min(problem.names.size(), kShownNames);
+  std::string text = joined({problem.names.begin(), problem.names.begin() + static_cast<std::ptrdiff_t>(shown)}, ", ");
+  if (shown < problem.names.size()) text += " and " + std::to_string(problem.names.size() - shown) + " more";
+  return text + ": " + problem.what;
+}
+
 HostView readHostView(Session& session) {
   const Session::Quiet quiet(session);
   HostView view;
-  view.systemName = zorvagent::currentConfig().systemName;
-  if (view.systemName.empty()) view.systemName = session.tree()->systemName();
+  view.hasSources = !session.isRemote();
+  view.systemName = systemNameOf(session, view);
   for (const broker::Instance& instance : askedFor(session, kEndpointClass, view)) {
     view.endpoints.push_back(endpointRow(instance));
   }
   readServers(session, view);
   readSettings(session, view);
   view.classes = readClassRows(session);
+  for (const ClassRow& row : view.classes) {
+    if (!row.problem.empty()) addProblem(view.problems, row.name, row.problem);
+  }
   return view;
 }
 

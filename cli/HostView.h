@@ -15,9 +15,11 @@ inline constexpr const char* kEndpointClass = "ZORVA_DNSProtocolEndPoint";
 inline constexpr const char* kServerClass = "ZORVA_RemoteServiceAccessPoint";
 inline constexpr const char* kSettingClass = "ZORVA_DNSSettingData";
 inline constexpr const char* kGeneralSettingClass = "ZORVA_DNSGeneralSettingData";
+inline constexpr const char* kSystemClass = "ZORVA_ComputerSystem";
 
-/// Where the value of a setting comes from: the interface's file, the host, or nowhere.
-enum class SettingSource { File, Host, None };
+/// Where the value of a setting comes from: the interface's file, the host, a value that was set and stands in for the
+/// host's own, or nowhere.
+enum class SettingSource { File, Host, Set, None };
 
 const char* sourceName(SettingSource source) noexcept;
 
@@ -46,10 +48,16 @@ struct SettingRow {
 
 struct ClassRow {
   std::string name;
-  std::string provider;  ///< the prefix of its create functions
+  std::string provider;  ///< the prefix of its create functions; empty: not known, as with a server's
   std::string library;
   std::optional<std::uint64_t> count;  ///< absent: the provider cannot be asked
   std::string problem;                 ///< then: why
+};
+
+/// Why some classes, or the associations of some objects, could not be asked.
+struct Problem {
+  std::vector<std::string> names;
+  std::string what;
 };
 
 struct HostView {
@@ -59,8 +67,20 @@ struct HostView {
   std::vector<SettingRow> interfaceSettings;
   std::vector<SettingRow> hostSettings;
   std::vector<ClassRow> classes;
-  std::vector<std::string> problems;  ///< what could not be asked; its part of the view is empty
+  bool hasSources = true;         ///< false: the settings' sources are not known, as with a server's
+  std::vector<Problem> problems;  ///< what could not be asked; its part of the view is empty
+
+  bool couldAsk(std::string_view className) const;
 };
+
+/// Adds a name to those with that reason.
+void addProblem(std::vector<Problem>& problems, const std::string& name, const std::string& what);
+
+/// The classes that could not be asked, those with the same reason together.
+std::vector<Problem> problemsOf(const std::vector<ClassRow>& rows);
+
+/// "ZORVA_A, ZORVA_B: CIM_ERR_FAILED (1): no library"; of many names the first ones and how many more.
+std::string problemText(const Problem& problem);
 
 /// Asks the providers. What one of them does not answer is left empty and told in `problems`.
 HostView readHostView(Session& session);
@@ -76,7 +96,7 @@ std::vector<broker::Instance> instancesOf(Session& session, std::string_view cla
 std::string interfaceOfSetting(const broker::Instance& setting);
 
 /// The interface whose file holds the settings of the host as a whole: that of the first configuration outside a
-/// service processor. Nothing where there is none.
+/// service processor. Nothing where there is none, and with a server, which does not say.
 std::optional<std::string> interfaceOfHostSettings(const Session& session);
 
 }  // namespace zorva::cli

@@ -28,6 +28,7 @@ std::string settingTable(const std::vector<SettingLine>& lines, const Layout& la
 
 void initInterfaceFile(const Arguments& arguments) {
   requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "ifcfg init");
+  requireLocal(arguments, "ifcfg init");
   const Session session(arguments);
   const auto tree = session.tree();
   const SettingFile file(arguments.target);
@@ -43,6 +44,7 @@ void initInterfaceFile(const Arguments& arguments) {
 
 void showInterfaceFile(const Arguments& arguments) {
   requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "ifcfg show");
+  requireLocal(arguments, "ifcfg show");
   const Session session(arguments);
   const SettingFile file(arguments.target);
   const std::vector<SettingLine> lines = file.read();

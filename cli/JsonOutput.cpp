@@ -46,8 +46,10 @@ Json ofClassRows(const std::vector<ClassRow>& rows) {
   for (const ClassRow& row : rows) {
     Json entry;
     entry["class"] = row.name;
-    entry["provider"] = row.provider;
-    entry["library"] = row.library;
+    if (!row.provider.empty()) {
+      entry["provider"] = row.provider;
+      entry["library"] = row.library;
+    }
     entry["instances"] = row.count ? Json(*row.count) : Json(nullptr);
     if (!row.problem.empty()) entry["problem"] = asUtf8(row.problem);
     list.push_back(std::move(entry));
@@ -66,12 +68,12 @@ Json ofEndpoint(const EndpointRow& row) {
   return entry;
 }
 
-Json ofSetting(const SettingRow& row) {
+Json ofSetting(const SettingRow& row, bool hasSources) {
   Json entry;
   entry["interface"] = asUtf8(row.interface);
   entry["setting"] = row.setting;
   entry["value"] = row.isList ? ofTexts(row.values) : Json(asUtf8(row.values.empty() ? "" : row.values.front()));
-  entry["from"] = row.source == SettingSource::None ? Json(nullptr) : Json(sourceName(row.source));
+  if (hasSources) entry["from"] = row.source == SettingSource::None ? Json(nullptr) : Json(sourceName(row.source));
   return entry;
 }
 
@@ -118,8 +120,9 @@ std::string hostViewJson(const HostView& view) {
   json["servers"] = ofRows(view.servers, [](const ServerRow& row) {
     return Json{{"order", row.order}, {"address", asUtf8(row.address)}};
   });
-  json["interface_settings"] = ofRows(view.interfaceSettings, ofSetting);
-  json["host_settings"] = ofRows(view.hostSettings, ofSetting);
+  const auto setting = [&view](const SettingRow& row) { return ofSetting(row, view.hasSources); };
+  json["interface_settings"] = ofRows(view.interfaceSettings, setting);
+  json["host_settings"] = ofRows(view.hostSettings, setting);
   json["classes"] = ofClassRows(view.classes);
   return dumped(json);
 }

@@ -15,6 +15,7 @@ namespace zorva::cli {
 
 void showOverlay(const Arguments& arguments) {
   requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "overlay show");
+  requireLocal(arguments, "overlay show");
   const Session session(arguments);
   const std::vector<zorvagent::OverlayEntry> entries = asFailure([] { return zorvagent::overlayEntries(); });
   std::vector<OverlayRow> rows;
@@ -37,6 +38,7 @@ void showOverlay(const Arguments& arguments) {
 
 void clearOverlay(const Arguments& arguments) {
   requireFormat(arguments.output, {OutputFormat::Table}, "overlay clear");
+  requireLocal(arguments, "overlay clear");
   const Session session(arguments);
   const auto interface = arguments.target.empty() ? std::nullopt : std::optional(arguments.target);
   const std::size_t cleared = asFailure([&interface] { return zorvagent::clearOverlay(interface); });

@@ -58,11 +58,55 @@ broker::ObjectPath shortened(broker::ObjectPath path) {
   return path;
 }
 
+/// Another host has a CIM server of its own; here its objects would be mistaken for those of this host.
+void requireThisHost(const Session& session, const broker::ObjectPath& path, std::string_view text) {
+  if (path.host.empty() || session.isThisHost(path.host)) return;
+  const std::size_t place = text.find("//") + 2;
+  throw Failure(ExitCode::WrongUsage,
+                "the path names the host " + printable(path.host) + " at byte " + std::to_string(place + 1) +
+                    ", and this is " + printable(session.tree()->systemName()) + "\n" + markedPlace(text, place),
+                "leave the host out, or give --url with the CIM server of that host");
+}
+
+/// A path is text like any other where a key holds it, so only its class tells a path from a slip.
+void requireClassesOfReferences(Session& session, const broker::ObjectPath& given) {
+  for (const broker::NamedValue& key : given.keys) {
+    if (!isReference(key.value)) continue;
+    const broker::ObjectPath& far = *std::get<broker::Boxed<broker::ObjectPath>>(key.value.scalar);
+    if (session.classes()->find(far.className) == nullptr && !session.isRemote()) {
+      throw Failure(ExitCode::WrongUsage,
+                    given.className + "." + key.name + "=" + printable(broker::quotedText(broker::pathText(far))) +
+                        ": there is no class " + printable(far.className),
+                    "a reference is the path of an instance, in quotes with a backslash before each quote in it: " +
+                        key.name + R"(="ZORVA_DNSProtocolEndPoint.Name=\"eth0\"")");
+    }
+    requireClassesOfReferences(session, far);
+  }
+}
+
+bool isServed(Session& session, const broker::ObjectPath& path) {
+  const std::vector<broker::ProviderEntry>& served = session.cim().served();
+  return std::any_of(served.begin(), served.end(), [&path](const broker::ProviderEntry& entry) {
+    return schema::sameName(entry.className, path.className);
+  });
+}
+
+/// Whether the path, and every reference in it, has all the keys of its class.
+bool isComplete(Session& session, const broker::ObjectPath& path, const schema::Class& declared) {
+  if (path.keys.size() != declared.keys().size()) return false;
+  return std::all_of(path.keys.begin(), path.keys.end(), [&session](const broker::NamedValue& key) {
+    if (!isReference(key.value)) return true;
+    const broker::ObjectPath& far = *std::get<broker::Boxed<broker::ObjectPath>>(key.value.scalar);
+    const schema::Class* farClass = session.classes()->find(far.className);
+    return farClass == nullptr || isComplete(session, far, *farClass);
+  });
+}
+
 std::vector<broker::ObjectPath> matchingInstances(Session& session, const broker::ObjectPath& given,
                                                   std::vector<broker::ObjectPath>& all) {
   std::vector<broker::ObjectPath> matching;
   const broker::Status status =
-      session.broker().enumerateInstanceNames(given.nameSpace, given.className, [&](const broker::ObjectPath& path) {
+      session.cim().enumerateInstanceNames(given.nameSpace, given.className, [&](const broker::ObjectPath& path) {
         if (keysMatch(given, path)) matching.push_back(path);
         all.push_back(shortened(path));
         return true;
@@ -90,6 +134,13 @@ broker::ObjectPath readClassName(std::string_view text) {
                 "zorvactl get shows an instance");
 }
 
+broker::ObjectPath resolveClass(Session& session, std::string_view text) {
+  broker::ObjectPath path = readClassName(text);
+  requireThisHost(session, path, text);
+  path.className = session.classNamed(path.className).name();
+  return path;
+}
+
 bool keysMatch(const broker::ObjectPath& given, const broker::ObjectPath& found) {
   return std::all_of(given.keys.begin(), given.keys.end(), [&found](const broker::NamedValue& key) {
     const broker::Value* value = found.key(key.name);
@@ -99,13 +150,14 @@ bool keysMatch(const broker::ObjectPath& given, const broker::ObjectPath& found)
 
 broker::ObjectPath resolvePath(Session& session, std::string_view text) {
   const broker::ObjectPath typed = readPath(text);
+  requireThisHost(session, typed, text);
   const schema::Class& declared = session.classNamed(typed.className);
   broker::ObjectPath given;
-  if (const broker::Status status = session.broker().canonicalPath(typed, given); !status.ok()) {
+  if (const broker::Status status = session.cim().canonicalPath(typed, given); !status.ok()) {
     throw Failure(ExitCode::WrongUsage, printable(text) + ": " + printable(status.message));
   }
-  const bool isServed = session.broker().registry().find(given.nameSpace, given.className) != nullptr;
-  if (isServed && given.keys.size() == declared.keys().size()) return given;
+  requireClassesOfReferences(session, given);
+  if (isServed(session, given) && isComplete(session, given, declared)) return given;
 
   std::vector<broker::ObjectPath> all;
   const std::vector<broker::ObjectPath> matching = matchingInstances(session, given, all);
@@ -116,6 +168,7 @@ broker::ObjectPath resolvePath(Session& session, std::string_view text) {
         all.empty() ? "the class " + given.className + " has no instances on this host" : "there are:" + listed(all));
   }
   std::vector<broker::ObjectPath> candidates;
+  candidates.reserve(matching.size());
   for (const broker::ObjectPath& path : matching) candidates.push_back(shortened(path));
   throw Failure(ExitCode::WrongUsage,
                 counted(matching.size(), "instance") + " fit " + printable(broker::pathText(shortened(given))),

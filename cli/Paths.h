@@ -19,9 +19,14 @@ broker::ObjectPath readPath(std::string_view text);
 /// the name.
 broker::ObjectPath readClassName(std::string_view text);
 
-/// The path of the one instance that `text` means. Names come out in the schema's spelling; keys that are left out are
-/// found by asking for the names of all instances, and so is the class where only one above it was named. Throws
-/// Failure where the text is wrong, no instance has these keys, or several have them (they are listed).
+/// The class that `text` means, with its namespace, in the schema's spelling. Throws Failure where the text is wrong,
+/// names another host, or there is no such class.
+broker::ObjectPath resolveClass(Session& session, std::string_view text);
+
+/// The path of the one instance that `text` means. Names come out in the schema's spelling; keys that are left out,
+/// also those of a reference, are found by asking for the names of all instances, and so is the class where only one
+/// above it was named. Throws Failure where the text is wrong, names another host or a class that is not, no instance
+/// has these keys, or several have them (they are listed).
 broker::ObjectPath resolvePath(Session& session, std::string_view text);
 
 /// True where every key that `given` has is in `found` with the same value. References are compared by the same rule,

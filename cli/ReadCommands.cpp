@@ -10,38 +10,38 @@ namespace zorva::cli {
 
 void enumerateNames(const Arguments& arguments) {
   Session session(arguments);
-  const broker::ObjectPath wanted = readClassName(arguments.target);
-  const schema::Class& declared = session.classNamed(wanted.className);
+  const broker::ObjectPath wanted = resolveClass(session, arguments.target);
   const auto writer = makeResultWriter(arguments.output, session.layout(), Count::Many, Results::Names);
   const broker::Status status =
-      session.broker().enumerateInstanceNames(wanted.nameSpace, declared.name(), [&](const broker::ObjectPath& path) {
+      session.cim().enumerateInstanceNames(wanted.nameSpace, wanted.className, [&](const broker::ObjectPath& path) {
         writer->add(path);
         return true;
       });
   writer->finish();
-  requireDone("enumerating the names of " + declared.name(), status);
+  requireDone("enumerating the names of " + wanted.className, status);
 }
 
 void enumerateInstances(const Arguments& arguments) {
   Session session(arguments);
-  const broker::ObjectPath wanted = readClassName(arguments.target);
-  const schema::Class& declared = session.classNamed(wanted.className);
+  const broker::ObjectPath wanted = resolveClass(session, arguments.target);
+  const broker::Selection selection = selectionOf(session, arguments, &session.classNamed(wanted.className));
   const auto writer = makeResultWriter(arguments.output, session.layout(), Count::Many, Results::Instances);
-  const broker::Status status = session.broker().enumerateInstances(
-      wanted.nameSpace, declared.name(), selectionOf(arguments), [&](const broker::Instance& instance) {
-        writer->add(instance);
-        return true;
-      });
+  const broker::Status status = session.cim().enumerateInstances(wanted.nameSpace, wanted.className, selection,
+                                                                 [&](const broker::Instance& instance) {
+                                                                   writer->add(instance);
+                                                                   return true;
+                                                                 });
   writer->finish();
-  requireDone("enumerating " + declared.name(), status);
+  requireDone("enumerating " + wanted.className, status);
 }
 
 void getInstance(const Arguments& arguments) {
   Session session(arguments);
   const auto writer = makeResultWriter(arguments.output, session.layout(), Count::One, Results::Instances);
   const broker::ObjectPath path = resolvePath(session, arguments.target);
+  const broker::Selection selection = selectionOf(session, arguments, &session.classNamed(path.className));
   broker::Instance instance;
-  const broker::Status status = session.broker().getInstance(path, selectionOf(arguments), instance);
+  const broker::Status status = session.cim().getInstance(path, selection, instance);
   if (!status.ok()) {
     throw operationFailure(arguments.target, status, "zorvactl names " + path.className + " lists what there is");
   }

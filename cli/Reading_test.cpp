@@ -96,7 +96,33 @@ TEST(Show, HasADashWhereAProviderIsMissing) {
   const Outcome outcome = host.run({"show", "--provider-dir", host.directory().path()});
   EXPECT_EQ(outcome.exitCode, 0);
   EXPECT_THAT(outcome.out, HasSubstr("ZORVA_DNSProtocolEndPoint               - "));
+  EXPECT_THAT(outcome.out, HasSubstr("\nEndpoints\n  -\n\nServers, in search order\n  -\n"));
   EXPECT_THAT(outcome.err, HasSubstr("libzorvadnsclientprofileprovider"));
+}
+
+TEST(Classes, TellOnceOfALibraryThatIsMissing) {
+  const Outcome outcome = TestHost().run({"classes", "--provider-dir", "/nowhere"});
+  EXPECT_EQ(outcome.exitCode, 0);
+  EXPECT_EQ(std::count(outcome.err.begin(), outcome.err.end(), '\n'), 2) << outcome.err;
+  EXPECT_THAT(outcome.err, HasSubstr("warning: ZORVA_ComputerSystem, ZORVA_SPComputerSystem, "));
+}
+
+TEST(Show, TellsOfValuesThatWereSet) {
+  const TestHost host;
+  shown(host, {"modify", kEth0, "DomainName=set.example"});
+  EXPECT_THAT(shown(host, {"show"}), HasSubstr("DomainName          set.example              set\n"));
+  host.directory().write("data/ifcfg-eth0", "DOMAINNAME=file.example\n");
+  EXPECT_THAT(shown(host, {"show"}), HasSubstr("DomainName          file.example"));
+}
+
+TEST(Show, LeavesOutWhatProvidersLogOnTheirWayUnlessALevelIsAskedFor) {
+  const TestHost host;
+  host.writeTree(
+      R"({"system_name": "host1", "nodes": [{"type": "System", "name": "system", "description": "Computer", "children": [)" +
+      TestHost::port("eth0") + R"(]}, {"type": "System", "name": "sp", "description": "BMC", "children": [)" +
+      TestHost::port("mgmt0") + "]}]}");
+  for (const char* command : {"show", "classes", "graph"}) EXPECT_EQ(host.run({command}).err, "") << command;
+  EXPECT_THAT(host.run({"show", "--log-level", "6000"}).err, HasSubstr("Key is not matched"));
 }
 
 TEST(Show, SendsNoControlCharacterToATerminal) {
@@ -197,10 +223,9 @@ TEST(Enumerate, TellsOfAProviderThatIsMissing) {
 
 TEST(Get, CompletesKeysAndSpellings) {
   const json found = jsonShown(TestHost(), {"gi", R"(zorva_dnsprotocolendpoint.name="eth0")"});
-  EXPECT_EQ(
-      found["path"],
-      R"(//host1/root/cimv2:ZORVA_DNSProtocolEndPoint.Name="eth0",SystemCreationClassName="ZORVA_ComputerSystem",)"
-      R"(SystemName="host1",CreationClassName="ZORVA_DNSProtocolEndPoint")");
+  EXPECT_EQ(found["path"],
+            R"(//host1/root/cimv2:ZORVA_DNSProtocolEndPoint.SystemCreationClassName="ZORVA_ComputerSystem",)"
+            R"(CreationClassName="ZORVA_DNSProtocolEndPoint",SystemName="host1",Name="eth0")");
 }
 
 TEST(Get, FindsTheOnlyInstanceByItsClassAlone) {
@@ -231,6 +256,46 @@ TEST(Get, TellsTheCodeOfAnInstanceThatIsNotThere) {
 
 TEST(Get, RefusesAKeyThatTheClassLacks) {
   expectRefused(TestHost(), {"gi", R"(ZORVA_DNSSettingData.Foo="x")"}, 2, "Foo");
+}
+
+TEST(Get, RefusesAPathOfAnotherHostAndMarksIt) {
+  for (const char* subcommand : {"gi", "ai", "ain", "ri", "rin"}) {
+    expectRefused(TestHost(), {subcommand, R"(//other/root/cimv2:ZORVA_DNSSettingData.InstanceID="Computer%eth0")"}, 2,
+                  "names the host other at byte 3, and this is host1\n  //other/root/cimv2:ZOR...\n    ^\n");
+  }
+  expectRefused(TestHost(), {"ei", "//other/root/cimv2:ZORVA_DNSSettingData"}, 2, "names the host other");
+  for (const char* host : {"host1", "HOST1", "localhost"}) {
+    shown(TestHost(), {"gi", std::string("//") + host + R"(/root/cimv2:ZORVA_DNSProtocolEndPoint.Name="eth0")"});
+  }
+}
+
+TEST(Get, RefusesANamespaceThatIsNot) {
+  expectRefused(TestHost(), {"gi", R"(root/foo:ZORVA_DNSProtocolEndPoint.Name="eth0")"}, 2,
+                "no namespace \"root/foo\"");
+}
+
+TEST(Get, RefusesAReferenceThatIsNoPath) {
+  expectRefused(TestHost(), {"gi", R"(ZORVA_DNSHostedAccessPoint.Antecedent="x")"}, 2,
+                "ZORVA_DNSHostedAccessPoint.Antecedent=\"x\": there is no class x\nzorvactl: a reference is the path");
+  expectRefused(TestHost(), {"ain", R"(ZORVA_DNSHostedAccessPoint.Antecedent="a b",Dependent="y")"}, 2, "Antecedent");
+  expectRefused(TestHost(), {"ri", "ZORVA_DNSHostedAccessPoint.Antecedent=5"}, 2, "5 is no ref");
+}
+
+TEST(Get, CompletesTheKeysOfReferencesThatAreIncomplete) {
+  EXPECT_THAT(shown(TestHost(), {"gi", R"(ZORVA_DNSHostedAccessPoint.Antecedent="ZORVA_ComputerSystem",)"
+                                       R"(Dependent="ZORVA_DNSProtocolEndPoint.Name=\"eth1\"")"}),
+              HasSubstr(R"(Name="eth1")"));
+}
+
+TEST(Get, RefusesAPropertyThatTheClassLacks) {
+  expectRefused(TestHost(), {"gi", kEth0, "--property", "Nope"}, 2,
+                "neither ZORVA_DNSProtocolEndPoint nor a class below it has a property Nope");
+  expectRefused(TestHost(), {"ai", kEth0, "--property", "No\x1Bpe"}, 2, "no class has a property No\\x1Bpe");
+}
+
+TEST(Get, RefusesAPathThatIsTooLong) {
+  const std::string path = R"(ZORVA_DNSProtocolEndPoint.Name=")" + std::string(100000, 'x') + "\"";
+  expectRefused(TestHost(), {"gi", path}, 2, "the path is 100033 bytes long; at most 65536 are read");
 }
 
 TEST(Get, MarksThePlaceWhereAPathIsWrong) {
@@ -294,6 +359,26 @@ TEST(Associators, RefuseAClassThatIsNot) {
   expectRefused(TestHost(), {"ri", kEth0, "--result-class", "CIM_Nothing"}, 2, "there is no class CIM_Nothing");
 }
 
+TEST(Associators, RefuseWhatNoAssociationCanMean) {
+  const TestHost host;
+  expectRefused(host, {"ai", kEth0, "--assoc-class", "ZORVA_DNSSettingData"}, 2,
+                "ZORVA_DNSSettingData is no association");
+  expectRefused(host, {"ain", "ZORVA_DNSGeneralSettingData", "--assoc-class", "ZORVA_RemoteAccessAvailableToElement"},
+                2,
+                "ZORVA_DNSGeneralSettingData is at no end of ZORVA_RemoteAccessAvailableToElement\n"
+                "zorvactl: its ends are Antecedent (ZORVA_RemoteServiceAccessPoint) and Dependent (");
+  expectRefused(host, {"ri", R"(ZORVA_DNSHostedAccessPoint.Dependent="ZORVA_DNSProtocolEndPoint.Name=\"eth0\"")"}, 2,
+                "ZORVA_DNSHostedAccessPoint is at no end of any association");
+  expectRefused(host, {"rin", kEth0, "--role", "fr\x1Bob"}, 2,
+                "--role: no association that is meant has a reference fr\\x1Bob\nzorvactl: there are ");
+  expectRefused(host, {"ain", kEth0, "--result-role", "Nobody"}, 2, "--result-role: no association");
+}
+
+TEST(Associators, WantASourceThatIsClear) {
+  expectRefused(TestHost(), {"ain", "ZORVA_DNSProtocolEndPoint"}, 2, "2 instances fit ZORVA_DNSProtocolEndPoint");
+  expectRefused(TestHost(), {"ain", R"(ZORVA_DNSProtocolEndPoint.Name="eth9")"}, 1, "there is no instance");
+}
+
 TEST(References, AreTheAssociationsThemselves) {
   const json names = jsonShown(TestHost(), {"rin", R"(ZORVA_RemoteServiceAccessPoint.Name="192.0.2.53")"});
   EXPECT_EQ(names.size(), 2U);
@@ -316,6 +401,30 @@ TEST(Graph, ReachesEveryObjectAndNamesWhatCannotBeFetched) {
 
 TEST(Graph, CanBeginAtOneObject) {
   EXPECT_THAT(shown(TestHost(), {"graph", kEth0}), StartsWith("ZORVA_DNSProtocolEndPoint."));
+}
+
+TEST(Graph, ShowsWhatIsThereWithoutTheCompanionLibrary) {
+  const TestHost host;
+  host.directory().link(ZORVA_LIB_DIR "/libzorvadnsclientprofileprovider.so.1",
+                        "lib/libzorvadnsclientprofileprovider.so.1");
+  const std::string directory = host.directory() / "lib";
+  for (const char* companion : {"", "this is no library"}) {
+    if (*companion != '\0') host.directory().write("lib/libzorvahostprofileprovider.so.1", companion);
+    const Outcome outcome = host.run({"graph", "--provider-dir", directory});
+    EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
+    EXPECT_THAT(outcome.out, HasSubstr("ZORVA_DNSSettingData Computer%eth0"));
+    EXPECT_THAT(outcome.out, EndsWith("\nEvery reference that could be asked for leads to an object.\n"));
+    EXPECT_THAT(outcome.err, AllOf(StartsWith("zorvactl: warning: ZORVA_ComputerSystem, ZORVA_SPComputerSystem, "),
+                                   HasSubstr("\nzorvactl: warning: associations of ZORVA_DNSProtocolEndPoint eth0, ")));
+    EXPECT_EQ(std::count(outcome.err.begin(), outcome.err.end(), '\n'), 2) << outcome.err;
+    EXPECT_THAT(shown(host, {"show", "--provider-dir", directory}),
+                AllOf(HasSubstr("ZORVA_ComputerSystem                    - "),
+                      HasSubstr("ZORVA_DNSProtocolEndPoint               2 ")));
+  }
+}
+
+TEST(Graph, FailsWhereNothingCanBeAsked) {
+  expectRefused(TestHost(), {"graph", "--provider-dir", "/nowhere"}, 1, "no class could be asked: ");
 }
 
 TEST(Graph, IsWrittenForGraphviz) {
@@ -387,13 +496,6 @@ TEST(StandardOutput, ThatIsFullIsAFailure) {
   EXPECT_THAT(outcome.err, HasSubstr("cannot write to standard output: No space left on device"));
 }
 
-TEST(ManualPage, HasEverySubcommand) {
-  const std::string page = zorvagent::testing::contentsOf(ZORVA_SOURCE_DIR "/cli/zorvactl.1");
-  const std::string words = shown(TestHost(), {"complete", "--", ""});
-  std::istringstream subcommands(words);
-  for (std::string each; std::getline(subcommands, each);) EXPECT_THAT(page, HasSubstr(each));
-}
-
 TEST(LogLevel, ShowsTheWayOfTheProviders) {
   EXPECT_THAT(TestHost().run({"ei", "ZORVA_DNSProtocolEndPoint"}).err, IsEmpty());
   EXPECT_THAT(TestHost().run({"ei", "ZORVA_DNSProtocolEndPoint", "--log-level", "3000"}).err,
@@ -410,10 +512,32 @@ TEST(CompletionScript, AsksTheProgramForClassesAndInterfaces) {
   const TestHost host;
   EXPECT_THAT(shown(host, {"completion", "bash"}), HasSubstr("complete -o default -F _zorvactl zorvactl"));
   EXPECT_EQ(shown(host, {"complete", "--", "dns", "set", "eth"}), "eth0\neth1\n");
+  EXPECT_EQ(shown(host, {"complete", "--", "dns", "set", "--url", "http://other", "eth"}), "");
   EXPECT_EQ(shown(host, {"complete", "--", "ei", "zorva_dnsgeneralS"}), "ZORVA_DNSGeneralSettingData\n");
   EXPECT_EQ(shown(host, {"complete", "--", "ov"}), "overlay\n");
   EXPECT_EQ(shown(host, {"complete", "--", "modify", "--dr"}), "--dry-run\n");
   EXPECT_EQ(shown(host, {"complete"}), "");
+}
+
+TEST(CompletionScript, KnowsWhatBelongsToAClass) {
+  const TestHost host;
+  EXPECT_EQ(shown(host, {"complete", "--", "modify", R"('ZORVA_DNSSettingData.InstanceID="x"')", "domain"}),
+            "DomainName=\n");
+  EXPECT_EQ(shown(host, {"complete", "--", "cm", "ZORVA_DNSProtocolEndPoint", "SetDNSD"}), "SetDNSDomain\n");
+  EXPECT_EQ(shown(host, {"complete", "--", "cm", "ZORVA_DNSProtocolEndPoint", "SetDNSDomain", ""}), "DNSDomain=\n");
+  EXPECT_EQ(shown(host, {"complete", "--", "ei", "ZORVA_DNSSettingData", "--property", "domain"}), "DomainName\n");
+  EXPECT_THAT(shown(host, {"complete", "--", "ain", "ZORVA_RemoteServiceAccessPoint", "--role", ""}),
+              StartsWith("Antecedent\nDependent\n"));
+  EXPECT_EQ(shown(host, {"complete", "--", "graph", "-o", ""}), "table\njson\ndot\nsvg\n");
+  EXPECT_EQ(shown(host, {"complete", "--", "completion", ""}), "bash\n");
+}
+
+TEST(CompletionScript, PutsTogetherTheWordsThatBashTookApart) {
+  const TestHost host;
+  EXPECT_EQ(shown(host, {"complete", "--", "show", "--output", "=", "j"}), "json\n");
+  EXPECT_EQ(shown(host, {"complete", "--", "cm", "'ZORVA_DNSProtocolEndPoint.Name", "=", "\"eth0\"'", "SetDNSD"}),
+            "SetDNSDomain\n");
+  EXPECT_EQ(shown(host, {"complete", "--", "gi", "ZORVA_DNSProtocolEndPoint.Name", "="}), "");
 }
 
 TEST(CompletionScript, IsTheOneThatIsInstalled) {

@@ -11,6 +11,8 @@
 
 #include "agent/Agent.h"
 #include "cli/Failure.h"
+#include "cli/LocalOperations.h"
+#include "cli/RemoteOperations.h"
 #include "cli/Text.h"
 #include "schema/Names.h"
 #include "schema/Schema.h"
@@ -54,6 +56,17 @@ void tell(const char* kind, std::string_view what) {
   std::fwrite(line.data(), 1, line.size(), stderr);
 }
 
+/// Passes over what the providers log, and tells the agent's own lines.
+class QuietLog : public zorvagent::LogSink {
+ public:
+  void record(const zorvagent::LogCall& /*call*/) override {}
+  void recordOwn(int level, const std::string& message) override {
+    if (level >= 5000) tellWarning(printable(message));
+  }
+};
+
+QuietLog quietLog;
+
 /// Keeps the agent's own lines until it is known what becomes of the call.
 class HeldBackLog : public zorvagent::LogSink {
  public:
@@ -86,23 +99,30 @@ class Finally {
 }  // namespace
 
 Session::Session(const Arguments& arguments)
-    : layout_(Layout::ofStandardOutput()), logLevel_(6000), providerDirectory_(arguments.providerDirectory) {
+    : layout_(Layout::ofStandardOutput()),
+      url_(arguments.url),
+      logLevel_(arguments.logLevel.value_or(6000)),
+      wantsLog_(arguments.logLevel.has_value()),
+      providerDirectory_(arguments.providerDirectory) {
+  if (isRemote()) return;
   asFailure([&] {
     zorvagent::loadConfig(arguments.config);
     if (arguments.logLevel) zorvagent::setLogLevel(zorvagent::LogStream::Log, *arguments.logLevel);
-    logLevel_ = arguments.logLevel.value_or(zorvagent::currentConfig().logLevel);
+    if (!arguments.logLevel) logLevel_ = zorvagent::currentConfig().logLevel;
   });
 }
 
 Session::~Session() = default;
 
 const std::shared_ptr<const schema::ClassRepository>& Session::classes() {
-  if (classes_ == nullptr) classes_ = schema::loadBuiltInClasses();
+  // A server may also have what describes it.
+  const auto set = isRemote() ? schema::ClassSet::Interop : schema::ClassSet::Profile;
+  if (classes_ == nullptr) classes_ = schema::loadBuiltInClasses(set);
   return classes_;
 }
 
 const schema::Class& Session::classNamed(std::string_view name) {
-  const schema::Class* found = classes()->find(name);
+  const schema::Class* found = isRemote() ? cim().classNamed(name) : classes()->find(name);
   if (found != nullptr) return *found;
   throw Failure(ExitCode::WrongUsage, "there is no class " + printable(name), similarNames(*classes(), name));
 }
@@ -112,38 +132,82 @@ std::shared_ptr<const zorvagent::TreeSnapshot> Session::tree() const {
   const bool holdsBack = zorvagent::currentConfig().logTarget == "stderr";
   HeldBackLog log(logLevel_);
   if (holdsBack) zorvagent::setLogSink(&log);
-  const Finally restore([holdsBack] {
-    if (holdsBack) zorvagent::setLogSink(nullptr);
-  });
+  const Finally restore([this] { placeLogSink(); });
   auto tree = asFailure([] { return zorvagent::currentTree(); });
   log.tell();
   return tree;
 }
 
-broker::Broker& Session::broker() {
-  if (broker_ != nullptr) return *broker_;
+Operations& Session::cim() {
+  if (cim_ != nullptr) return *cim_;
+  if (isRemote()) {
+    cim_ = std::make_unique<RemoteOperations>(url_, classes());
+    return *cim_;
+  }
   tree();
   broker::BrokerOptions options;
   options.providerDirectory = providerDirectory_.empty() ? defaultProviderDirectory() : providerDirectory_;
   options.log = [this](broker::LogLevel level, std::string_view text) { log(level, text); };
-  broker_ = std::make_unique<broker::Broker>(classes(), std::move(options));
-  return *broker_;
+  cim_ = std::make_unique<LocalOperations>(classes(), std::move(options));
+  return *cim_;
+}
+
+void Session::placeLogSink() const {
+  if (isRemote()) return;
+  // A sink takes the lines of all targets: a file must not go without them.
+  const zorvagent::Config& config = zorvagent::currentConfig();
+  const bool isQuietLog = isQuiet() && config.logTarget == "stderr" && config.traceTarget == "off";
+  zorvagent::setLogSink(isQuietLog ? &quietLog : nullptr);
+}
+
+Session::Quiet::Quiet(Session& session) : session_(session) {
+  ++session_.quiet_;
+  session_.placeLogSink();
+}
+
+Session::Quiet::~Quiet() {
+  --session_.quiet_;
+  session_.placeLogSink();
 }
 
 void Session::log(broker::LogLevel level, std::string_view text) const {
   // The broker's levels on the agent's scale of numbers.
   constexpr int kLevels[] = {3000, 4000, 5000, 6000};
   const int number = kLevels[static_cast<std::size_t>(level)];
-  if (number < std::min(logLevel_, 5000) || (quiet_ > 0 && number < 6000)) return;
+  if (isQuiet() || number < std::min(logLevel_, 5000)) return;
   tell(level == broker::LogLevel::Error     ? "error: "
        : level == broker::LogLevel::Warning ? "warning: "
                                             : "",
        printable(text));
 }
 
-broker::Selection selectionOf(const Arguments& arguments) {
+bool Session::isThisHost(std::string_view name) const {
+  return isRemote() || schema::sameName(name, "localhost") || schema::sameName(name, tree()->systemName()) ||
+         schema::sameName(name, zorvagent::currentConfig().systemName);
+}
+
+void requireLocal(const Arguments& arguments, const char* subcommand) {
+  if (arguments.url.empty()) return;
+  throw Failure(ExitCode::WrongUsage,
+                std::string("zorvactl ") + subcommand + " is about files of this host, which no CIM server hands out",
+                "leave out --url, and run it on the host that is meant");
+}
+
+broker::Selection selectionOf(Session& session, const Arguments& arguments, const schema::Class* top) {
   broker::Selection selection;
-  if (!arguments.properties.empty()) selection.propertyList = arguments.properties;
+  if (arguments.properties.empty()) return selection;
+  const std::vector<const schema::Class*>& classes = session.classes()->classes();
+  for (const std::string& property : arguments.properties) {
+    const auto hasIt = [&](const schema::Class* each) {
+      return (top == nullptr || each->isA(*top)) && each->findProperty(property) != nullptr;
+    };
+    if (std::any_of(classes.begin(), classes.end(), hasIt) || (top != nullptr && hasIt(top))) continue;
+    throw Failure(ExitCode::WrongUsage,
+                  (top == nullptr ? "no class" : "neither " + top->name() + " nor a class below it") +
+                      " has a property " + printable(property),
+                  "the same command without --property shows what there is");
+  }
+  selection.propertyList = arguments.properties;
   return selection;
 }
 

@@ -8,21 +8,21 @@
 
 #include "agent/config/Config.h"
 #include "agent/tree/TreeSnapshot.h"
-#include "broker/Broker.h"
 #include "cli/Arguments.h"
 #include "cli/Failure.h"
+#include "cli/Operations.h"
 #include "cli/Table.h"
 #include "cli/Text.h"
 
-// One run of the program: the agent with its configuration, and the broker with the providers, each set up when a
-// command first needs it. Belongs to one thread.
+// One run of the program: the agent with its configuration, and who does the CIM operations, each set up when a command
+// first needs it. Belongs to one thread.
 
 namespace zorva::cli {
 
 class Session {
  public:
-  /// Reads the agent's configuration. Throws Failure (wrong usage) where that is wrong, or where a log cannot be
-  /// opened.
+  /// Reads the agent's configuration, unless a server is to be asked. Throws Failure (wrong usage) where that is wrong,
+  /// or where a log cannot be opened.
   explicit Session(const Arguments& arguments);
   Session(const Session&) = delete;
   Session& operator=(const Session&) = delete;
@@ -30,12 +30,22 @@ class Session {
 
   const Layout& layout() const noexcept { return layout_; }
 
+  /// True where a server is asked, and not the providers in this process: then nothing is known of the host but what
+  /// CIM says, and tree() must not be called.
+  bool isRemote() const noexcept { return !url_.empty(); }
+
+  /// The server's URL as it was given.
+  const std::string& url() const noexcept { return url_; }
+
   /// The tree of the host as it is now. Throws Failure where it, or the file that stands for it, cannot be read.
   std::shared_ptr<const zorvagent::TreeSnapshot> tree() const;
 
-  /// The broker; the providers are loaded when they are first asked. Throws Failure where the tree of the host, or the
-  /// file that stands for it, cannot be read: the providers would only say that there is nothing.
-  broker::Broker& broker();
+  /// True where a path with this host in it means the host that is asked; a server judges of that itself.
+  bool isThisHost(std::string_view name) const;
+
+  /// Who does the CIM operations; providers are loaded when they are first asked. Throws Failure where the tree of the
+  /// host, or the file that stands for it, cannot be read: the providers would only say that there is nothing.
+  Operations& cim();
 
   /// The classes alone, for commands that ask nothing of a provider.
   const std::shared_ptr<const schema::ClassRepository>& classes();
@@ -43,12 +53,13 @@ class Session {
   /// The class of that name, in any case. Throws Failure (wrong usage) with names that are like it where there is none.
   const schema::Class& classNamed(std::string_view name);
 
-  /// While it lives, what the broker tells of libraries that cannot be loaded is not shown: the command shows it
-  /// itself.
+  /// While it lives, neither what the broker tells of libraries that cannot be loaded is shown, nor what the providers
+  /// log on standard error, unless a log level was asked for: for commands that ask many things and say themselves what
+  /// they did not get.
   class Quiet {
    public:
-    explicit Quiet(Session& session) : session_(session) { ++session_.quiet_; }
-    ~Quiet() { --session_.quiet_; }
+    explicit Quiet(Session& session);
+    ~Quiet();
     Quiet(const Quiet&) = delete;
     Quiet& operator=(const Quiet&) = delete;
 
@@ -58,14 +69,21 @@ class Session {
 
  private:
   void log(broker::LogLevel level, std::string_view text) const;
+  bool isQuiet() const noexcept { return quiet_ > 0 && !wantsLog_; }
+  void placeLogSink() const;
 
   Layout layout_;
+  std::string url_;
   int logLevel_;
-  int quiet_ = 0;
+  bool wantsLog_;
+  int quiet_ = 0;  // how many Quiet live
   std::string providerDirectory_;
   std::shared_ptr<const schema::ClassRepository> classes_;
-  std::unique_ptr<broker::Broker> broker_;
+  std::unique_ptr<Operations> cim_;
 };
+
+/// Throws Failure (wrong usage) where a server is to be asked: `subcommand` reads or writes files of this host.
+void requireLocal(const Arguments& arguments, const char* subcommand);
 
 /// Does the work with what the agent throws turned into Failure: wrong files are the user's to mend, all else is a
 /// failure.
@@ -82,8 +100,9 @@ auto asFailure(Work work) {
   }
 }
 
-/// What of each instance the arguments want.
-broker::Selection selectionOf(const Arguments& arguments);
+/// What of each instance the arguments want. Throws Failure (wrong usage) where neither `top` nor a class below it, or,
+/// without one, no class at all, has a property of such a name.
+broker::Selection selectionOf(Session& session, const Arguments& arguments, const schema::Class* top);
 
 /// The lines of an error on stderr: what, and what to do next.
 void tellError(std::string_view what, std::string_view hint = {});

@@ -20,9 +20,11 @@ Style styleOfState(const EndpointRow& row) {
   return row.stateNumber == 3 ? Style::Bad : Style::Warning;
 }
 
-void writeSection(const std::string& heading, const Table& table, const std::string& whenEmpty, const Layout& layout) {
+/// A part of the view; without rows it says why there are none.
+void writeSection(const std::string& heading, const Table& table, const std::string& whenEmpty, bool couldAsk,
+                  const Layout& layout) {
   write(styled(heading, Style::Heading, layout) + "\n");
-  write(table.empty() ? "  " + whenEmpty + "\n" : table.text(layout));
+  write(table.empty() ? (couldAsk ? "  " + whenEmpty : std::string("  -")) + "\n" : table.text(layout));
   write("\n");
 }
 
@@ -41,23 +43,35 @@ Table serverTable(const HostView& view) {
   return table;
 }
 
-Table settingTable(const std::vector<SettingRow>& rows) {
-  Table table({"INTERFACE", "SETTING", "VALUE", "FROM"}, 2);
+Style styleOfSource(SettingSource source) {
+  if (source == SettingSource::File) return Style::Good;
+  return source == SettingSource::Set ? Style::Warning : Style::Faint;
+}
+
+Table settingTable(const std::vector<SettingRow>& rows, bool hasSources) {
+  std::vector<std::string> headings{"INTERFACE", "SETTING", "VALUE"};
+  if (hasSources) headings.emplace_back("FROM");
+  Table table(headings, 2);
   const std::string* before = nullptr;
   for (const SettingRow& row : rows) {
     const bool isSame = before != nullptr && *before == row.interface;
-    table.add({isSame ? "" : orDash(row.interface), row.setting, orDash(joined(row.values, " ")),
-               Cell(sourceName(row.source), row.source == SettingSource::File ? Style::Good : Style::Faint)});
+    std::vector<Cell> cells{isSame ? "" : orDash(row.interface), row.setting, orDash(joined(row.values, " "))};
+    if (hasSources) cells.emplace_back(sourceName(row.source), styleOfSource(row.source));
+    table.add(std::move(cells));
     before = &row.interface;
   }
   return table;
 }
 
 Table classTable(const std::vector<ClassRow>& rows) {
-  Table table({"CLASS", "INSTANCES", "PROVIDER", "LIBRARY"}, 2);
+  const bool hasProviders = !rows.empty() && !rows.front().provider.empty();
+  std::vector<std::string> headings{"CLASS", "INSTANCES"};
+  if (hasProviders) headings.insert(headings.end(), {"PROVIDER", "LIBRARY"});
+  Table table(headings, 2);
   for (const ClassRow& row : rows) {
-    table.add(
-        {row.name, row.count ? Cell(std::to_string(*row.count)) : Cell("-", Style::Faint), row.provider, row.library});
+    std::vector<Cell> cells{row.name, row.count ? Cell(std::to_string(*row.count)) : Cell("-", Style::Faint)};
+    if (hasProviders) cells.insert(cells.end(), {row.provider, row.library});
+    table.add(std::move(cells));
   }
   return table;
 }
@@ -74,12 +88,15 @@ void showHost(const Arguments& arguments) {
   }
   const Layout& layout = session.layout();
   write("DNS client configuration of " + styled(printable(view.systemName), Style::Heading, layout) + "\n\n");
-  writeSection("Endpoints", endpointTable(view), "none: this host has no network interface besides loopback", layout);
-  writeSection("Servers, in search order", serverTable(view), "none configured", layout);
-  writeSection("Settings of each interface", settingTable(view.interfaceSettings), "none", layout);
-  writeSection("Settings of the host", settingTable(view.hostSettings), "none", layout);
-  writeSection("Classes", classTable(view.classes), "none", layout);
-  for (const std::string& problem : view.problems) tellWarning(problem);
+  writeSection("Endpoints", endpointTable(view), "none: this host has no network interface besides loopback",
+               view.couldAsk(kEndpointClass), layout);
+  writeSection("Servers, in search order", serverTable(view), "none configured", view.couldAsk(kServerClass), layout);
+  writeSection("Settings of each interface", settingTable(view.interfaceSettings, view.hasSources), "none",
+               view.couldAsk(kSettingClass), layout);
+  writeSection("Settings of the host", settingTable(view.hostSettings, view.hasSources), "none",
+               view.couldAsk(kGeneralSettingClass), layout);
+  writeSection("Classes", classTable(view.classes), "none", true, layout);
+  for (const Problem& problem : view.problems) tellWarning(problemText(problem));
 }
 
 void listClasses(const Arguments& arguments) {
@@ -91,9 +108,7 @@ void listClasses(const Arguments& arguments) {
     return;
   }
   write(classTable(rows).text(session.layout()));
-  for (const ClassRow& row : rows) {
-    if (!row.problem.empty()) tellWarning(row.problem);
-  }
+  for (const Problem& problem : problemsOf(rows)) tellWarning(problemText(problem));
 }
 
 }  // namespace zorva::cli

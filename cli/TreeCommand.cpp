@@ -13,6 +13,7 @@ namespace zorva::cli {
 
 void showTree(const Arguments& arguments) {
   requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "tree");
+  requireLocal(arguments, "tree");
   const Session session(arguments);
   const std::shared_ptr<const zorvagent::TreeSnapshot> tree = session.tree();
   write(arguments.output == OutputFormat::Json ? zorvagent::treeToJson(*tree) : treeText(*tree, session.layout()));

@@ -13,7 +13,7 @@ using namespace zorva::cli;
 ExitCode run(int argc, const char* const* argv) {
   const auto read = readArguments(argc, argv);
   if (const auto* telling = std::get_if<Telling>(&read)) {
-    if (telling->isError) throw Failure(ExitCode::WrongUsage, telling->text, "zorvactl --help shows the usage");
+    if (telling->isError) throw Failure(ExitCode::WrongUsage, telling->text, telling->hint);
     write(telling->text);
   } else {
     const auto& invocation = std::get<Invocation>(read);

@@ -42,6 +42,11 @@ elseif(NOT ZORVA_SANITIZE STREQUAL "")
   message(FATAL_ERROR "ZORVA_SANITIZE is '${ZORVA_SANITIZE}'; it takes address, thread or nothing")
 endif()
 
+# What the fuzzer steers by.
+if(ZORVA_FUZZ)
+  add_compile_options(-fsanitize=fuzzer-no-link)
+endif()
+
 if(ZORVA_COVERAGE)
   add_compile_options(--coverage -fprofile-abs-path)
   add_link_options(--coverage)

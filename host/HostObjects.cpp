@@ -50,7 +50,9 @@ std::string firstLine(const char* path) {
 // A name for this machine that is the same at every start and tells nothing of the machine's id, which must not leave
 // the host; empty where the machine has no id.
 std::string machineName() {
-  constexpr sd_id128_t kApplication = SD_ID128_MAKE(5c, 3b, 0e, 8d, 2a, 94, 4f, 61, 9d, 77, 1b, c8, 40, e6, 52, 9f);
+  // Without SD_ID128_MAKE, which is no C++.
+  constexpr sd_id128_t kApplication = {
+      {0x5c, 0x3b, 0x0e, 0x8d, 0x2a, 0x94, 0x4f, 0x61, 0x9d, 0x77, 0x1b, 0xc8, 0x40, 0xe6, 0x52, 0x9f}};
   sd_id128_t id;
   if (sd_id128_get_machine_app_specific(kApplication, &id) < 0) return {};
   std::array<char, SD_ID128_STRING_MAX> text{};

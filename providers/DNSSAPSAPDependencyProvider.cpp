@@ -237,7 +237,8 @@ static CMPIStatus DNSSAPSAPDependency_References(CMPIAssociationMI*, const CMPIC
     }
     for (unsigned short i = 0; i < count16(endpoints); ++i) {
       CMPIObjectPath* endpoint = endpoints.at(i);
-      if (!firstTokenEquals(keyText(ref, "Name", &status), keyText(endpoint, "Name", &status))) continue;
+      const std::string sourceName = keyText(ref, "Name", &status);
+      if (!firstTokenEquals(sourceName, keyText(endpoint, "Name", &status))) continue;
       CMPIInstance* reference = newInstance(broker, association, &status);
       setNameSpaceAndHost(endpoint, nameSpace);
       setReference(reference, "Antecedent", ref);
@@ -252,7 +253,8 @@ static CMPIStatus DNSSAPSAPDependency_References(CMPIAssociationMI*, const CMPIC
     }
     while (hasNext(ipEndpoints, &status)) {
       const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &status);
-      if (!firstTokenEquals(keyText(ipEndpoint, "Name", &status), keyText(ref, "Name", &status))) continue;
+      const std::string ipName = keyText(ipEndpoint, "Name", &status);
+      if (!firstTokenEquals(ipName, keyText(ref, "Name", &status))) continue;
       returnInstance(result, newPair(broker, association, "Antecedent", ipEndpoint, "Dependent", ref, &status));
     }
   }
@@ -282,7 +284,8 @@ static CMPIStatus DNSSAPSAPDependency_ReferenceNames(CMPIAssociationMI*, const C
     }
     for (unsigned short i = 0; i < count16(endpoints); ++i) {
       CMPIObjectPath* endpoint = endpoints.at(i);
-      if (!firstTokenEquals(keyText(ref, "Name", &status), keyText(endpoint, "Name", &status))) continue;
+      const std::string sourceName = keyText(ref, "Name", &status);
+      if (!firstTokenEquals(sourceName, keyText(endpoint, "Name", &status))) continue;
       CMPIInstance* reference = newInstance(broker, association, &status);
       setNameSpaceAndHost(endpoint, nameSpace);
       setReference(reference, "Antecedent", ref);
@@ -299,7 +302,8 @@ static CMPIStatus DNSSAPSAPDependency_ReferenceNames(CMPIAssociationMI*, const C
     }
     while (hasNext(ipEndpoints, &status)) {
       const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &status);
-      if (!firstTokenEquals(keyText(ipEndpoint, "Name", &status), keyText(ref, "Name", &status))) continue;
+      const std::string ipName = keyText(ipEndpoint, "Name", &status);
+      if (!firstTokenEquals(ipName, keyText(ref, "Name", &status))) continue;
       CMPIObjectPath* path =
           objectPathOf(newPair(broker, association, "Antecedent", ipEndpoint, "Dependent", ref, &status), &status);
       setNameSpaceAndHost(path, nameSpace);

@@ -45,6 +45,10 @@ FileText readFile(const std::string& path, std::size_t limit) {
   return result;
 }
 
+bool mayPass(int error) {
+  return error == EMFILE || error == ENFILE || error == ENOMEM || error == EIO || error == ESTALE;
+}
+
 std::string fileErrorText(int error) {
   if (error == EINVAL) return "not a regular file";
   return std::generic_category().message(error);

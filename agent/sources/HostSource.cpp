@@ -54,13 +54,6 @@ unsigned int protocolType(const AddressList& addresses) {
   return ipv4 ? kIPv4 : kIPv6;
 }
 
-// A file that cannot be read counts as one that says nothing; a line that the limit cuts is left out.
-std::string linesOf(const std::string& path) {
-  FileText file = readFile(path, kLargestFile);
-  if (file.truncated) file.text.erase(file.text.rfind('\n') + 1);
-  return std::move(file.text);
-}
-
 SharedStrings share(StringList list) { return std::make_shared<const StringList>(std::move(list)); }
 
 using AddressesOfLinks = std::unordered_map<int, AddressList>;
@@ -84,7 +77,7 @@ bool HostSource::changed() {
   if (!watching_) return true;
   const bool linksChanged = monitor_.changed();
   if (watch_.changed()) filesMoved_ = true;
-  return linksChanged || filesMoved_ || kernelNodeName() != nodeName_;
+  return linksChanged || filesMoved_ || unread_ || kernelNodeName() != nodeName_;
 }
 
 void HostSource::reopen() {
@@ -103,6 +96,7 @@ void HostSource::startWatching() {
 
 std::shared_ptr<const TreeSnapshot> HostSource::read() {
   startWatching();
+  unread_ = false;
   nodeName_ = kernelNodeName();
   const Resolver resolver = readResolver();
   LinkTable table = reader_.read();
@@ -132,12 +126,22 @@ std::shared_ptr<const TreeSnapshot> HostSource::read() {
   return builder.finish();
 }
 
-HostSource::Resolver HostSource::readResolver() const {
+// A line that the limit cuts is left out.
+FileText HostSource::readLines(const std::string& path) {
+  FileText file = readFile(path, kLargestFile);
+  if (file.truncated) file.text.erase(file.text.rfind('\n') + 1);
+  if (mayPass(file.error)) unread_ = true;
+  return file;
+}
+
+// A file that cannot be read counts as one that says nothing.
+std::string HostSource::linesOf(const std::string& path) { return readLines(path).text; }
+
+HostSource::Resolver HostSource::readResolver() {
   Resolver result;
-  FileText file = readFile(resolvConf_, kLargestFile);
+  const FileText file = readLines(resolvConf_);
   ResolvConf conf;
   if (file.error == 0) {
-    if (file.truncated) file.text.erase(file.text.rfind('\n') + 1);
     conf = parseResolvConf(file.text);
     StringList servers = conf.servers;
     if (namesOnlyLocalStub(conf)) {
@@ -153,9 +157,11 @@ HostSource::Resolver HostSource::readResolver() const {
 }
 
 // What the machine is called by its maker, where the firmware tells. It stays the same while the machine runs.
-const std::string& HostSource::product() {
+std::string HostSource::product() {
   if (!product_.empty()) return product_;
-  std::string name = linesOf(options_.root + "/sys/class/dmi/id/product_name");
+  const FileText file = readLines(options_.root + "/sys/class/dmi/id/product_name");
+  if (mayPass(file.error)) return kComputer;
+  std::string name = file.text;
   const std::size_t end = name.find_last_not_of(" \t\r\n");
   name.erase(end == std::string::npos ? 0 : end + 1);
   // "BMC" is what tells a service processor, and this is none.

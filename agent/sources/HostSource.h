@@ -4,6 +4,7 @@
 #include <string>
 
 #include "agent/files/FileWatch.h"
+#include "agent/files/ReadFile.h"
 #include "agent/sources/HostNames.h"
 #include "agent/sources/Netlink.h"
 #include "agent/tree/TreeSource.h"
@@ -42,8 +43,10 @@ class HostSource : public TreeSource {
   };
 
   void startWatching();
-  Resolver readResolver() const;
-  const std::string& product();
+  FileText readLines(const std::string& path);
+  std::string linesOf(const std::string& path);
+  Resolver readResolver();
+  std::string product();
 
   HostSourceOptions options_;
   std::string resolvConf_;
@@ -55,6 +58,7 @@ class HostSource : public TreeSource {
   FileWatch watch_;
   bool watching_ = false;
   bool filesMoved_ = true;  // the ways to the files must be walked again
+  bool unread_ = false;     // a file could not be read for a reason that may pass
   std::string nodeName_;
   std::string product_;  // empty until it is read
 };

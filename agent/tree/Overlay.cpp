@@ -1,6 +1,7 @@
 #include "agent/tree/Overlay.h"
 
 #include <stdexcept>
+#include <utility>
 
 #include "agent/files/ReadFile.h"
 #include "agent/files/ReplaceFile.h"
@@ -77,7 +78,11 @@ Overlay::Overlay(const std::string& dataDir) : directory_(dataDir), file_(dataDi
 OverlayValues Overlay::read() const {
   const FileText file = readFile(file_, kLargestJson);
   if (file.error == ENOENT) return {};
-  if (file.error != 0) throw ConfigError(file_, 0, {}, "cannot be read: " + fileErrorText(file.error));
+  if (file.error != 0) {
+    const std::string problem = "cannot be read: " + fileErrorText(file.error);
+    if (mayPass(file.error)) throw OverlayUnreadable(file_, 0, {}, problem);
+    throw ConfigError(file_, 0, {}, problem);
+  }
   if (file.truncated) throw ConfigError(file_, 0, {}, "is larger than 64 MiB");
   return valuesFromJson(parseJson(file.text, file_), file_);
 }
@@ -128,10 +133,14 @@ void Overlay::write(const OverlayValues& values) const {
 
 void OverlayReader::read() {
   watch_.watch({overlay_.file()});
-  values_.clear();
+  const bool wasUnreadable = std::exchange(unreadable_, false);
   try {
     values_ = overlay_.read();
+  } catch (const OverlayUnreadable& error) {
+    unreadable_ = true;
+    if (!wasUnreadable) ZORVAGENT_LOG_ERROR(std::string("the values that were set stay as they were: ") + error.what());
   } catch (const ConfigError& error) {
+    values_.clear();
     ZORVAGENT_LOG_ERROR(std::string("the values that were set are not used: ") + error.what());
   }
 }

@@ -7,6 +7,7 @@
 #include <optional>
 #include <string>
 
+#include "agent/config/Config.h"
 #include "agent/files/FileWatch.h"
 #include "agent/tree/TreeSnapshot.h"
 
@@ -14,6 +15,12 @@ namespace zorvagent {
 
 // By the path of a node, then by property.
 using OverlayValues = std::map<std::string, std::map<PropertyNumber, PropertyValue>>;
+
+// The overlay's file cannot be read for a reason that may pass, such as the want of a descriptor.
+class OverlayUnreadable : public ConfigError {
+ public:
+  using ConfigError::ConfigError;
+};
 
 // The file "overlay.json" of a data directory, a JSON object of objects: node path, property name, value. Every change
 // reads it again under a lock ("overlay.lock") and puts a new file in its place, so that processes do not lose one
@@ -25,7 +32,8 @@ class Overlay {
 
   const std::string& file() const { return file_; }
 
-  // What stands in the file; nothing where there is none. Throws ConfigError where it is wrong or cannot be read.
+  // What stands in the file; nothing where there is none. Throws ConfigError where it is wrong or cannot be read,
+  // OverlayUnreadable where that may pass.
   OverlayValues read() const;
 
   // Stores a value, or takes one back where there is none given. Throws std::runtime_error, with one line, where the
@@ -54,10 +62,12 @@ class OverlayReader {
  public:
   explicit OverlayReader(const std::string& dataDir) : overlay_(dataDir) {}
 
-  // Whether the file may have changed since it was read last; true before the first time. Never blocks.
-  bool changed() { return watch_.changed(); }
+  // Whether the file may have changed since it was read last, or could not be read then for a reason that may pass; true
+  // before the first time. Never blocks.
+  bool changed() { return watch_.changed() || unreadable_; }
 
-  // Reads the file. A file that is wrong is logged and counts as empty: what the host says can still be read.
+  // Reads the file. A file that is wrong is logged and counts as empty: what the host says can still be read. Where it
+  // cannot be read for a reason that may pass, that is logged once, and what was read before holds meanwhile.
   void read();
 
   // The tree with the values in the place of its own; the same tree where none concerns it.
@@ -67,6 +77,7 @@ class OverlayReader {
   Overlay overlay_;
   FileWatch watch_;
   OverlayValues values_;
+  bool unreadable_ = false;
 };
 
 }  // namespace zorvagent

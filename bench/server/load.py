@@ -1,0 +1,263 @@
+#!/usr/bin/env python3
+"""Puts zorvacimd under load and holds each figure against its target.
+
+  bench/server/load.py --build build/bench [NAME...]
+
+Throughput is a ratio: requests per second of the server over those of a ceiling, the same bytes served from memory by
+the same HTTP library in the same threading mode. Both are measured by wrk in turns, since machines are noisy, and the
+medians are compared. NAME picks the figures whose name holds it. Exits 1 where a figure falls short.
+"""
+
+import argparse
+import contextlib
+import dataclasses
+import http.client
+import json
+import os
+import re
+import socket
+import statistics
+import subprocess
+import sys
+import tempfile
+import time
+
+HERE = os.path.dirname(os.path.abspath(__file__))
+THREADS = 2
+TURNS = 5
+SECONDS = 1
+
+
+@dataclasses.dataclass
+class Figure:
+    name: str
+    value: float
+    limit: float
+    at_least: bool
+    measured: str
+
+    def verdict(self):
+        if self.limit is None:
+            return ""
+        return "ok" if (self.value >= self.limit) == self.at_least or self.value == self.limit else "SHORT"
+
+
+def free_tree(directory, interfaces):
+    """A configuration of the agent over a tree of that many interfaces; over this host where interfaces is None."""
+    config = '[agent]\ndata_dir = "data/"\n[log]\ntarget = "off"\n'
+    if interfaces is not None:
+        ports = [{"type": "Port", "name": f"eth{i}", "description": "", "children": [
+            {"type": "NetworkIPConfig", "name": "ip", "description": "", "properties": {
+                "name": f"eth{i}", "host_name": "host1", "domain_name": "example.org",
+                "dns_suffixes": ["example.org"], "dns_server_addresses": ["192.0.2.53", "192.0.2.54"],
+                "protocol_if_type": 4097, "enabled_state": 1}}]} for i in range(interfaces)]
+        tree = {"system_name": "host1", "nodes": [
+            {"type": "System", "name": "system", "description": "Computer", "children": ports}]}
+        with open(os.path.join(directory, "tree.json"), "w", encoding="utf-8") as file:
+            json.dump(tree, file)
+        config += '[tree]\nsource = "file"\nfile = "tree.json"\n'
+    path = os.path.join(directory, "agent.toml")
+    with open(path, "w", encoding="utf-8") as file:
+        file.write(config)
+    return path
+
+
+@contextlib.contextmanager
+def server(build, program, interfaces=None):
+    """Runs a server on a free port; gives its process and port."""
+    with tempfile.TemporaryDirectory() as directory:
+        config = os.path.join(directory, "zorvacimd.toml")
+        with open(config, "w", encoding="utf-8") as file:
+            file.write(f"[http]\nthreads = {THREADS}\n")
+        process = subprocess.Popen(
+            [os.path.join(build, "bin", program), "--config", config, "--listen", "127.0.0.1", "--port", "0",
+             "--agent-config", free_tree(directory, interfaces)], stdout=subprocess.PIPE, text=True)
+        try:
+            yield process, int(process.stdout.readline().rsplit(":", 1)[1])
+        finally:
+            process.terminate()
+            process.wait(timeout=30)
+
+
+@contextlib.contextmanager
+def ceiling(build, body):
+    """Serves the bytes from memory; gives the port."""
+    with tempfile.NamedTemporaryFile() as file:
+        file.write(body)
+        file.flush()
+        process = subprocess.Popen([os.path.join(build, "bin", "server_ceiling"), file.name, str(THREADS)],
+                                   stdin=subprocess.PIPE, stdout=subprocess.PIPE, text=True)
+        try:
+            yield int(process.stdout.readline())
+        finally:
+            process.stdin.close()
+            process.wait(timeout=30)
+
+
+def request(class_name):
+    return (f'<?xml version="1.0" encoding="utf-8"?>\n<CIM CIMVERSION="2.0" DTDVERSION="2.0">'
+            f'<MESSAGE ID="1" PROTOCOLVERSION="1.0"><SIMPLEREQ><IMETHODCALL NAME="EnumerateInstances">'
+            f'<LOCALNAMESPACEPATH><NAMESPACE NAME="root"/><NAMESPACE NAME="cimv2"/></LOCALNAMESPACEPATH>'
+            f'<IPARAMVALUE NAME="ClassName"><CLASSNAME NAME="{class_name}"/></IPARAMVALUE>'
+            f'</IMETHODCALL></SIMPLEREQ></MESSAGE></CIM>')
+
+
+def ask(port, class_name):
+    connection = http.client.HTTPConnection("127.0.0.1", port, timeout=30)
+    connection.request("POST", "/cimom", request(class_name), {
+        "Content-Type": 'application/xml; charset="utf-8"', "CIMOperation": "MethodCall",
+        "CIMMethod": "EnumerateInstances", "CIMObject": "root/cimv2"})
+    response = connection.getresponse()
+    body = response.read()
+    connection.close()
+    if response.status != 200 or b"<ERROR" in body:
+        raise RuntimeError(f"{class_name}: status {response.status}: {body[:300]!r}")
+    return body
+
+
+def load(port, class_name, connections, seconds=SECONDS):
+    """Requests per second, and the latencies in microseconds at which 50 and 99 of 100 requests are done."""
+    output = subprocess.run(
+        ["wrk", "-t1", f"-c{connections}", f"-d{seconds}s", "--latency", "-s", os.path.join(HERE, "post.lua"),
+         f"http://127.0.0.1:{port}", class_name], check=True, stdout=subprocess.PIPE, text=True).stdout
+    wrong = re.search(r"Non-2xx.*|Socket errors.*", output)
+    if wrong:
+        raise RuntimeError(f"{class_name}: {wrong.group(0)}")
+    rate, half, most = re.search(r"FIGURES (\S+) (\S+) (\S+)", output).groups()
+    return float(rate), float(half), float(most)
+
+
+def throughput(build, class_name, limit, tail_limit):
+    figures = []
+    with server(build, "server_bench") as (_, port), ceiling(build, ask(port, class_name)) as best:
+        count = {"Bench_Few": "4 instances", "Bench_Many": "1,000 instances"}[class_name]
+        for connections in (1, 8):
+            runs, best_runs = [], []
+            for _ in range(TURNS):
+                best_runs.append(load(best, class_name, connections)[0])
+                runs.append(load(port, class_name, connections))
+            rate = statistics.median(run[0] for run in runs)
+            top = statistics.median(best_runs)
+            name = f"{count}, {connections} connection{'s' if connections > 1 else ''}"
+            figures.append(Figure(f"{name}: requests/s, to the ceiling's", rate / top, limit, True,
+                                  f"{rate:.0f} / {top:.0f} a second"))
+            if connections == 1:
+                half, most = (statistics.median(run[i] for run in runs) for i in (1, 2))
+                figures.append(Figure(f"{name}: p99, to p50", most / half, tail_limit, False,
+                                      f"{most:.0f} / {half:.0f} us"))
+    return figures
+
+
+def endpoints(build):
+    """The real class, beside what it costs without HTTP and XML; no target."""
+    figures = []
+    class_name = "ZORVA_DNSProtocolEndPoint"
+    for interfaces, what in ((None, "this host"), (1000, "1,000 interfaces")):
+        with server(build, "zorvacimd", interfaces) as (process, port), ceiling(build, ask(port, class_name)) as best:
+            before = threads_time(process.pid)
+            rate, half, most = load(port, class_name, 1, 3)
+            after = threads_time(process.pid)
+            top = load(best, class_name, 1)[0]
+            spent = {name: after.get(name, 0) - before.get(name, 0) for name in after}
+            whole = sum(spent.values()) or 1
+            where = ", ".join(f"{name} {100 * time_ / whole:.0f} %" for name, time_ in sorted(spent.items()) if time_)
+            figures.append(Figure(f"endpoints of {what}, 1 connection: requests/s, to the ceiling's", rate / top, None,
+                                  True, f"{rate:.0f} / {top:.0f} a second, p50 {half:.0f} us, p99 {most:.0f} us; "
+                                  f"CPU: {where}"))
+    return figures
+
+
+def threads_time(process):
+    """Ticks of processor time by the name of the threads: workers do providers and XML, MHD-worker does HTTP."""
+    times = {}
+    for task in os.listdir(f"/proc/{process}/task"):
+        with contextlib.suppress(OSError), open(f"/proc/{process}/task/{task}/stat", encoding="utf-8") as file:
+            name, rest = re.match(r"\d+ \((.*)\) (.*)", file.read()).groups()
+            fields = rest.split()
+            times[name] = times.get(name, 0) + int(fields[11]) + int(fields[12])
+    return times
+
+
+def start_time(build):
+    """From the start of the process to the end of the first answer, in milliseconds; the median."""
+    times = []
+    with tempfile.TemporaryDirectory() as directory:
+        agent = free_tree(directory, None)
+        config = os.path.join(directory, "zorvacimd.toml")
+        open(config, "w", encoding="utf-8").close()
+        for _ in range(11):
+            with socket.socket() as probe:
+                probe.bind(("127.0.0.1", 0))
+                port = probe.getsockname()[1]
+            begin = time.perf_counter()
+            process = subprocess.Popen([os.path.join(build, "bin", "zorvacimd"), "--config", config, "--listen",
+                                        "127.0.0.1", "--port", str(port), "--agent-config", agent])
+            while True:
+                with contextlib.suppress(ConnectionRefusedError):
+                    ask(port, "ZORVA_DNSProtocolEndPoint")
+                    break
+                time.sleep(0.0005)
+            times.append((time.perf_counter() - begin) * 1000)
+            process.terminate()
+            process.wait(timeout=30)
+    value = statistics.median(times)
+    return [Figure("start to the first answer, ms", value, 20, False, f"{min(times):.1f} to {max(times):.1f} ms")]
+
+
+def resident_mb(process):
+    with open(f"/proc/{process}/status", encoding="utf-8") as file:
+        return int(re.search(r"VmRSS:\s+(\d+) kB", file.read()).group(1)) / 1024
+
+
+def memory(build):
+    with server(build, "zorvacimd") as (process, port):
+        ask(port, "ZORVA_DNSProtocolEndPoint")
+        time.sleep(1.5)
+        idle = resident_mb(process.pid)
+    with server(build, "server_bench") as (process, port):
+        load(port, "Bench_TenThousand", 8, 3)
+        peak = resident_mb(process.pid)
+        time.sleep(2)
+        after = resident_mb(process.pid)
+    return [Figure("resident memory idle, MB", idle, 15, False, f"{idle:.1f} MB"),
+            Figure("resident memory after 10,000 instances, MB", after, 30, False, f"{after:.1f} MB, {peak:.1f} at most")]
+
+
+def main():
+    parser = argparse.ArgumentParser(description=__doc__, formatter_class=argparse.RawDescriptionHelpFormatter)
+    parser.add_argument("--build", default="build/bench", help="the build folder (default: %(default)s)")
+    parser.add_argument("names", nargs="*", metavar="NAME", help="only: few, many, endpoints, start, memory")
+    arguments = parser.parse_args()
+    build = os.path.abspath(arguments.build)
+    parts = {
+        "few": lambda: throughput(build, "Bench_Few", 0.35, 5),
+        "many": lambda: throughput(build, "Bench_Many", 0.13, 5),
+        "start": lambda: start_time(build),
+        "memory": lambda: memory(build),
+        "endpoints": lambda: endpoints(build),
+    }
+    wanted = [name for name in arguments.names if name != "server"] or list(parts)
+    if not set(wanted) <= set(parts):
+        parser.error(f"no figure has such a name; there are {', '.join(parts)}")
+    figures = []
+    for name in wanted:
+        print(f"measuring {name} ...", file=sys.stderr)
+        figures += parts[name]()
+
+    width = max(len(figure.name) for figure in figures)
+    print(f"{'FIGURE':{width}}  VALUE  TARGET         MEASURED")
+    for figure in figures:
+        target = "" if figure.limit is None else f"{'>=' if figure.at_least else '<='} {figure.limit:g}"
+        print(f"{figure.name:{width}}  {figure.value:5.2f}  {target:7}  {figure.verdict():5}  {figure.measured}")
+    short = sum(figure.verdict() == "SHORT" for figure in figures)
+    if short:
+        print(f"{short} of {len(figures)} figures fall short", file=sys.stderr)
+    return 1 if short else 0
+
+
+if __name__ == "__main__":
+    try:
+        sys.exit(main())
+    except (OSError, RuntimeError, subprocess.CalledProcessError) as error:
+        print(f"load.py: {error}", file=sys.stderr)
+        sys.exit(1)

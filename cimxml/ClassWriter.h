@@ -1,0 +1,41 @@
+#pragma once
+
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "schema/ClassRepository.h"
+
+// Classes and qualifiers as elements of CIM-XML (DSP0201 2.4, DTD DSP0203 2.4.0). As ElementWriter.h: each function
+// appends one element, keeps no state, and may be called on any thread.
+
+namespace zorva::cimxml {
+
+/// What of a class is written (DSP0200 5.3.2.1).
+struct ClassDetail {
+  bool localOnly = true;
+  bool qualifiers = true;
+  bool classOrigin = false;
+  /// Absent: all properties. Methods are not concerned.
+  std::optional<std::vector<std::string>> propertyList;
+};
+
+/// CLASS with its properties and methods. `classes` knows the qualifiers' types.
+void appendClass(std::string& out, const schema::Class& declared, const ClassDetail& detail,
+                 const schema::ClassRepository& classes);
+
+/// CLASSNAME.
+void appendClassName(std::string& out, std::string_view name);
+
+/// CLASSPATH.
+void appendClassPath(std::string& out, std::string_view host, std::string_view nameSpace, std::string_view name);
+
+/// A QUALIFIER for each. `inherited`: all are marked as propagated, whatever they say themselves.
+void appendQualifiers(std::string& out, const schema::Qualifiers& qualifiers, bool inherited,
+                      const schema::ClassRepository& classes);
+
+/// QUALIFIER.DECLARATION.
+void appendQualifierType(std::string& out, const schema::QualifierType& type);
+
+}  // namespace zorva::cimxml

@@ -1,0 +1,84 @@
+#pragma once
+
+#include <cstddef>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <variant>
+#include <vector>
+
+#include "broker/Value.h"
+#include "cimxml/XmlCheck.h"
+
+// CIM-XML requests (DSP0201 2.4, operations of DSP0200 1.4) as plain values.
+//
+// The reader takes any bytes. It is as lenient as DSP0200 wants a server to be: elements and attributes that the DTD
+// does not know are passed over. Values keep the form of the text that they came in where only the schema can tell
+// their type: `broker::Value` holds a text, and the broker turns it into what is declared. Time and memory grow with
+// the text alone, within the limits. The function keeps no state and may be called on any thread.
+
+namespace zorva::cimxml {
+
+struct ReaderLimits {
+  XmlLimits xml;
+  std::size_t calls = 100;  ///< SIMPLEREQs in one MULTIREQ
+};
+
+/// How DSP0200 6.3 classifies a refusal (the CIMError header).
+enum class Fault {
+  NotWellFormed,
+  NotLooselyValid,
+  UnsupportedCimVersion,
+  UnsupportedDtdVersion,
+  UnsupportedProtocolVersion,
+  UnsupportedOperation,
+};
+
+struct RequestError {
+  Fault fault = Fault::NotWellFormed;
+  std::string message;  ///< what is wrong, and where: "line 3, column 9: …"
+};
+
+/// The name of a class as the value of a parameter.
+struct ClassName {
+  std::string name;
+};
+
+/// A class or a qualifier type as the value of a parameter. It is not read: no operation that takes one is offered.
+struct Declaration {};
+
+/// An array of texts; a null element has no text.
+using TextList = std::vector<std::optional<std::string>>;
+
+/// The value of an IPARAMVALUE: none (null), VALUE, VALUE.ARRAY, CLASSNAME, INSTANCENAME or VALUE.REFERENCE, INSTANCE
+/// or VALUE.NAMEDINSTANCE, CLASS or QUALIFIER.DECLARATION. An array of texts has a text for each of its values.
+using ParameterValue =
+    std::variant<std::monostate, std::string, TextList, ClassName, broker::ObjectPath, broker::Instance, Declaration>;
+
+struct Parameter {
+  std::string name;
+  ParameterValue value;
+};
+
+/// An IMETHODCALL or a METHODCALL.
+struct Call {
+  bool isExtrinsic = false;
+  std::string name;
+  /// The namespace; of a METHODCALL also the class and, unless `onClass`, the keys of what the method is called on. A
+  /// key with an empty name is the only key that there is (INSTANCENAME with a bare KEYVALUE).
+  broker::ObjectPath target;
+  bool onClass = false;
+  std::vector<Parameter> parameters;      ///< of an IMETHODCALL
+  std::vector<broker::NamedValue> input;  ///< of a METHODCALL
+};
+
+struct CimRequest {
+  std::string id;
+  bool isMultiple = false;
+  std::vector<Call> calls;  ///< one, or with `isMultiple` two or more
+};
+
+/// Reads a request. On an error, `request` is left in an unspecified state.
+std::optional<RequestError> readRequest(std::string_view text, const ReaderLimits& limits, CimRequest& request);
+
+}  // namespace zorva::cimxml

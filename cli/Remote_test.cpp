@@ -1,0 +1,358 @@
+// zorvactl --url as a process: against the server of this project, where it must say what it says without one, and
+// against servers that misbehave.
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <nlohmann/json.hpp>
+#include <regex>
+
+#include "cli/TestHost.h"
+#include "cli/TestServer.h"
+
+namespace zorva::cli {
+namespace {
+
+using nlohmann::json;
+using testing::AllOf;
+using testing::HasSubstr;
+using testing::Not;
+using testing::StartsWith;
+using zorvagent::testing::contentsOf;
+
+using Words = std::vector<std::string>;
+
+constexpr const char* kEth0 = R"(ZORVA_DNSProtocolEndPoint.Name="eth0")";
+constexpr const char* kSetting = R"(ZORVA_DNSSettingData.InstanceID="Computer%eth0")";
+constexpr const char* kFile =
+    "HOSTNAME=host1\nDOMAINNAME=example.org\nCONFIG_NAME=\nDNSSERVERS=192.0.2.53 \n"
+    "DNSSUFFIXES=example.org \n";
+
+/// Names of a host and a service processor, with addresses, odd names and files of settings.
+void makeWorld(const TestHost& host) {
+  const std::string addresses = R"("addresses": [{"address": "192.0.2.10", "prefix_length": 24, "origin": "static"},)"
+                                R"({"address": "2001:db8::10", "prefix_length": 64, "origin": "slaac"}])";
+  host.writeTree(
+      R"({"system_name": "host1", "nodes": [{"type": "System", "name": "system", "description": "Computer", "children": [)" +
+      TestHost::port("eth0", R"("domain_name": "example.org", "dns_suffixes": ["a&b", "<\"x y\">"], )" + addresses) +
+      "," + TestHost::port("\u7db2\u8def") +
+      R"(]}, {"type": "System", "name": "sp", "description": "BMC", "children": [)" +
+      TestHost::port("mgmt0", addresses) + "]}]}");
+  host.directory().write("data/ifcfg-eth0", kFile);
+}
+
+/// Without the hosts of paths, which a server may write where the providers do not, and the other way round.
+std::string withoutHosts(std::string text) {
+  for (const auto& [pattern, replacement] :
+       std::vector<std::pair<std::string, std::string>>{{R"(//[A-Za-z0-9.-]+/(?=root/))", ""},
+                                                        {"</?NAMESPACEPATH>|<HOST>[^<]*</HOST>", ""},
+                                                        {"LOCALINSTANCEPATH", "INSTANCEPATH"},
+                                                        {"OBJECTWITHLOCALPATH", "OBJECTWITHPATH"}}) {
+    text = std::regex_replace(text, std::regex(pattern), replacement);
+  }
+  return text;
+}
+
+/// One host, served.
+class Remote : public testing::Test {
+ protected:
+  static void SetUpTestSuite() {
+    host_ = new TestHost;
+    makeWorld(*host_);
+    server_ = new TestServer(*host_);
+  }
+  static void TearDownTestSuite() {
+    delete server_;
+    delete host_;
+  }
+
+  void SetUp() override { ASSERT_NE(server_->url(), "") << "the server did not start"; }
+
+  static Outcome local(Words words) {
+    words.insert(words.end(), {"--log-level", "9999"});
+    return host_->run(words);
+  }
+  static Outcome remote(Words words) {
+    words.insert(words.end(), {"--url", server_->url() + "/root/cimv2"});
+    return host_->run(words);
+  }
+
+  static void expectSame(const Words& words) {
+    std::string command;
+    for (const std::string& word : words) command += word + " ";
+    const Outcome here = local(words);
+    const Outcome there = remote(words);
+    EXPECT_EQ(there.exitCode, here.exitCode) << command << there.err;
+    EXPECT_EQ(withoutHosts(there.out), withoutHosts(here.out)) << command;
+    EXPECT_EQ(withoutHosts(there.err), withoutHosts(here.err)) << command;
+  }
+
+  static TestHost* host_;
+  static TestServer* server_;
+};
+
+TestHost* Remote::host_ = nullptr;
+TestServer* Remote::server_ = nullptr;
+
+TEST_F(Remote, EnumeratesTheSameInEachFormat) {
+  for (const char* format : {"table", "json", "mof", "xml"}) {
+    for (const char* name : {"CIM_ManagedElement", "CIM_Dependency", "CIM_Component", "CIM_ElementSettingData"}) {
+      expectSame({"ei", name, "-o", format});
+    }
+  }
+  expectSame({"ei", "zorva_dnsprotocolendpoint", "--property", "hostname", "--property", "EnabledState"});
+  expectSame({"ein", "CIM_ManagedElement"});
+  expectSame({"ein", "CIM_ManagedElement", "-o", "json"});
+}
+
+TEST_F(Remote, GetsTheSame) {
+  for (const char* format : {"table", "json", "mof", "xml"}) {
+    expectSame({"gi", kEth0, "-o", format});
+    expectSame({"gi", kSetting, "-o", format});
+  }
+  expectSame({"gi", "ZORVA_DNSGeneralSettingData", "--property", "InstanceID"});
+  expectSame({"gi", R"(ZORVA_DNSHostedAccessPoint.Dependent="ZORVA_DNSProtocolEndPoint.Name=\"mgmt0\"")"});
+}
+
+TEST_F(Remote, FollowsTheSameAssociations) {
+  for (const char* format : {"table", "json"}) {
+    expectSame({"ai", kEth0, "-o", format});
+    expectSame({"ain", kEth0, "-o", format});
+    expectSame({"ri", kEth0, "-o", format});
+    expectSame({"rin", R"(ZORVA_RemoteServiceAccessPoint.Name="192.0.2.53")", "-o", format});
+  }
+  expectSame({"ai", kEth0, "--result-class", "CIM_RemoteServiceAccessPoint", "--property", "Name"});
+  expectSame({"ain", kEth0, "--assoc-class", "CIM_Dependency", "--role", "Dependent", "--result-role", "Antecedent"});
+  expectSame({"ri", kSetting, "--result-class", "ZORVA_DNSOrderedComponent", "--role", "PartComponent"});
+  expectSame({"ain", R"(ZORVA_SPComputerSystem)"});
+}
+
+TEST_F(Remote, DrawsTheSameGraph) {
+  for (const char* format : {"table", "json", "dot"}) expectSame({"graph", "-o", format});
+  expectSame({"graph", kSetting});
+}
+
+TEST_F(Remote, ShowsTheSameButWhatCimDoesNotSay) {
+  json here = json::parse(local({"show", "-o", "json"}).out);
+  for (const char* settings : {"interface_settings", "host_settings"}) {
+    for (json& row : here[settings]) row.erase("from");
+  }
+  for (json& row : here["host_settings"]) row["interface"] = "";
+  for (json& row : here["classes"]) {
+    row.erase("provider");
+    row.erase("library");
+  }
+  EXPECT_EQ(json::parse(remote({"show", "-o", "json"}).out), here);
+  EXPECT_EQ(json::parse(remote({"classes", "-o", "json"}).out), here["classes"]);
+
+  const std::string table = remote({"show"}).out;
+  EXPECT_THAT(table, AllOf(StartsWith("DNS client configuration of host1\n"), Not(HasSubstr("FROM")),
+                           Not(HasSubstr("PROVIDER"))));
+  const auto head = [](const std::string& text) { return text.substr(0, text.find("\nSettings")); };
+  EXPECT_EQ(head(table), head(local({"show"}).out));
+}
+
+TEST_F(Remote, CallsTheSameMethods) {
+  expectSame({"cm", kEth0, "SetDNSDomain", "DNSDomain=x.example"});
+  expectSame({"cm", kEth0, "SetDNSSuffixSearchOrder", "DNSDomainSuffixSearchOrder=a", "DNSDomainSuffixSearchOrder=b"});
+  expectSame({"cm", kEth0, "SetDNSDomain", "DNSDomain=x", "-o", "json"});
+  expectSame({"cm", kEth0, "SetDNSDomain"});
+}
+
+TEST_F(Remote, FailsTheSame) {
+  expectSame({"gi", R"(ZORVA_DNSSettingData.InstanceID="nothing")"});
+  expectSame({"gi", "ZORVA_DNSSettingData"});
+  expectSame({"gi", R"(ZORVA_DNSProtocolEndPoint.Name="eth9")"});
+  expectSame({"gi", R"(ZORVA_DNSSettingData.Foo="x")"});
+  expectSame({"gi", R"(ZORVA_DNSSettingData.InstanceID="x)"});
+  expectSame({"ei", "ZORVA_DNSProtocol"});
+  expectSame({"ai", kEth0, "--assoc-class", "CIM_Nothing"});
+  EXPECT_EQ(remote({"ain", kEth0, "--role", "Nobody"}).exitCode, 2);
+  expectSame({"modify", kSetting, "DomainName=a\nb"});
+  expectSame({"modify", R"(ZORVA_RemoteServiceAccessPoint.Name="192.0.2.53")", "ElementName=x"});
+  expectSame({"dns", "show", "eth7"});
+}
+
+TEST_F(Remote, ShowsAndTriesChangesTheSame) {
+  expectSame({"dns", "show", "eth0"});
+  expectSame({"suffixes", "show", "-o", "json"});
+  expectSame({"dns", "add", "eth0", "192.0.2.99", "--dry-run"});
+  expectSame({"domain", "eth0", "lab.example.org", "--dry-run"});
+  expectSame({"modify", kSetting, "DomainName=lab.example.org", "--dry-run", "-o", "json"});
+}
+
+TEST(RemoteChange, WritesTheSameAsOneWithoutAServer) {
+  const TestHost here;
+  const TestHost there;
+  makeWorld(here);
+  makeWorld(there);
+  const TestServer server(there);
+  ASSERT_NE(server.url(), "");
+  for (const Words& words :
+       std::vector<Words>{{"modify", kSetting, "DomainName=lab.example.org", "RequestedHostname=h2"},
+                          {"modify", kSetting, "ConfigurationName=a \"b\" <c>", "--only"},
+                          {"modify", kSetting, "DomainName=bad name"},
+                          {"dns", "set", "eth0", "192.0.2.1", "2001:db8::1"},
+                          {"dns", "add", "eth0", "192.0.2.2"},
+                          {"dns", "remove", "eth0", "192.0.2.1"},
+                          {"domain", "eth0", "x.example"},
+                          {"suffixes", "set", "a.example", "b.example"},
+                          {"suffixes", "remove", "a.example"},
+                          {"modify", kEth0, "DomainName=set.example"}}) {
+    Words without = words;
+    without.insert(without.end(), {"--log-level", "9999"});
+    Words with = words;
+    with.insert(with.end(), {"--url", server.url()});
+    const Outcome a = here.run(without);
+    const Outcome b = there.run(with);
+    EXPECT_EQ(b.exitCode, a.exitCode) << words[0] << b.err;
+    EXPECT_EQ(withoutHosts(b.out), withoutHosts(a.out)) << words[0];
+    EXPECT_EQ(withoutHosts(b.err), withoutHosts(a.err)) << words[0];
+    EXPECT_EQ(contentsOf(there.dataFile("ifcfg-eth0")), contentsOf(here.dataFile("ifcfg-eth0"))) << words[0];
+  }
+  EXPECT_EQ(there.run({"tree", "-o", "json"}).out, here.run({"tree", "-o", "json"}).out);
+  EXPECT_THAT(contentsOf(there.dataFile("ifcfg-eth0")), HasSubstr("DNSSERVERS=2001:db8::1 192.0.2.2 \n"));
+}
+
+TEST(RemoteChange, WarnsWhereItCameToNothing) {
+  const TestHost host;
+  const TestServer server(host);
+  const Outcome outcome = host.run({"domain", "eth0", "lab.example.org", "--url", server.url()});
+  EXPECT_EQ(outcome.exitCode, 0);
+  EXPECT_THAT(outcome.err, HasSubstr("DomainName was not stored: the interface's file of settings there is missing, or "
+                                     "has no line DOMAINNAME="));
+}
+
+TEST_F(Remote, ReachesTheOtherNamespacesOfAServer) {
+  const Outcome outcome = host_->run({"ei", "CIM_Namespace", "-o", "json", "--url", server_->url() + "/interop"});
+  EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
+  EXPECT_THAT(outcome.out, HasSubstr("root/cimv2"));
+  EXPECT_EQ(remote({"ei", "interop:CIM_Namespace", "-o", "json"}).out, outcome.out);
+}
+
+TEST_F(Remote, RefusesWhatIsAboutFilesOfThisHost) {
+  for (const Words& words : std::vector<Words>{
+           {"tree"}, {"ifcfg", "init", "eth0"}, {"ifcfg", "show", "eth0"}, {"overlay", "show"}, {"overlay", "clear"}}) {
+    const Outcome outcome = remote(words);
+    EXPECT_EQ(outcome.exitCode, 2) << words[0];
+    EXPECT_EQ(outcome.out, "");
+    EXPECT_THAT(outcome.err, HasSubstr("is about files of this host, which no CIM server hands out"));
+  }
+}
+
+TEST_F(Remote, NeedsNoConfigurationOfTheAgentHere) {
+  EXPECT_EQ(host_
+                ->runWith({{"ZORVAGENT_CONFIG", "/nowhere/agent.toml"}},
+                          {"ein", "ZORVA_DNSSettingData", "--url", server_->url()})
+                .exitCode,
+            0);
+}
+
+// --- servers that misbehave
+
+/// How "names" ends against a server that says this.
+Outcome against(const std::string& reply) {
+  const ScriptedServer server({reply});
+  return TestHost().run({"names", "ZORVA_DNSSettingData", "--url", server.url()});
+}
+
+TEST(RemoteFailure, TellsWhereNobodyListens) {
+  const Outcome outcome = TestHost().run({"show", "--url", "http://127.0.0.1:1"});
+  EXPECT_EQ(outcome.exitCode, 1);
+  EXPECT_THAT(outcome.err, StartsWith("zorvactl: no answer from http://127.0.0.1:1: "));
+}
+
+TEST(RemoteFailure, TellsOfAUrlThatIsNone) {
+  const Outcome outcome = TestHost().run({"show", "--url", "localhost:5988"});
+  EXPECT_EQ(outcome.exitCode, 2);
+  EXPECT_THAT(outcome.err, HasSubstr("--url: it begins neither with http:// nor with https://"));
+}
+
+TEST(RemoteFailure, TellsOfHttpThatIsNoSuccess) {
+  Outcome outcome = against(ScriptedServer::reply("", "401 Unauthorized"));
+  EXPECT_EQ(outcome.exitCode, 1);
+  EXPECT_THAT(outcome.err, HasSubstr("answered HTTP 401: it wants another login"));
+  outcome = against(ScriptedServer::reply("", "400 Bad Request", "CIMError: request-not-well-formed%20\x1B[2J\r\n"));
+  EXPECT_EQ(outcome.exitCode, 1);
+  EXPECT_THAT(outcome.err, HasSubstr("answered HTTP 400: request-not-well-formed \\x1B[2J\n"));
+  outcome = against(ScriptedServer::reply("", "302 Found", "Location: http://127.0.0.1:1/\r\n"));
+  EXPECT_THAT(outcome.err, HasSubstr("answered HTTP 302\n")) << "a redirection is not followed";
+}
+
+TEST(RemoteFailure, TellsOfWhatIsNoCimXml) {
+  for (const char* body : {"", "hello", "<html></html>", "<CIM><MESSAGE>"}) {
+    const Outcome outcome = against(ScriptedServer::reply(body));
+    EXPECT_EQ(outcome.exitCode, 1) << body;
+    EXPECT_THAT(outcome.err, HasSubstr("the answer of the server is no CIM-XML response: ")) << body;
+  }
+}
+
+TEST(RemoteFailure, TellsOfAnAnswerThatBreaksOff) {
+  Outcome outcome = against("HTTP/1.1 200 OK\r\nContent-Length: 1000\r\n\r\n<CIM>");
+  EXPECT_EQ(outcome.exitCode, 1);
+  EXPECT_THAT(outcome.err, HasSubstr("no answer from http://127.0.0.1:"));
+  const std::string body = ScriptedServer::cimReply("<IRETURNVALUE/>");
+  const std::string xml = body.substr(body.find("\r\n\r\n") + 4);
+  char size[16];
+  std::snprintf(size, sizeof size, "%zx", xml.size());
+  outcome = against(std::string("HTTP/1.1 200 OK\r\nTransfer-Encoding: chunked\r\nTrailer: CIMStatusCode\r\n\r\n") +
+                    size + "\r\n" + xml + "\r\n0\r\nCIMStatusCode: 1\r\nCIMStatusCodeDescription: it%20fell\r\n\r\n");
+  EXPECT_EQ(outcome.exitCode, 1);
+  EXPECT_THAT(outcome.err, HasSubstr("broke off: CIM_ERR_FAILED (1): it fell\n"));
+}
+
+TEST(RemoteFailure, ShowsNoControlCharacterOfAServer) {
+  const Outcome outcome = against(ScriptedServer::cimReply(
+      R"(<IRETURNVALUE><INSTANCENAME CLASSNAME="C"><KEYBINDING NAME="K"><KEYVALUE>a&#x85;&#9;b</KEYVALUE></KEYBINDING>)"
+      "</INSTANCENAME></IRETURNVALUE>"));
+  EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
+  EXPECT_EQ(outcome.out, "C.K=\"a\\u0085\\tb\"\n");
+}
+
+// --- classes that are not known here
+
+constexpr const char* kDisk =
+    R"(<IRETURNVALUE><CLASS NAME="X_Disk"><PROPERTY NAME="Number" TYPE="uint16"><QUALIFIER NAME="Key" TYPE="boolean">)"
+    R"(<VALUE>TRUE</VALUE></QUALIFIER></PROPERTY><PROPERTY NAME="State" TYPE="uint8"></PROPERTY>)"
+    R"(<METHOD NAME="Spin" TYPE="uint32"><PARAMETER NAME="Speed" TYPE="sint32"/></METHOD></CLASS></IRETURNVALUE>)";
+constexpr const char* kDiskNames =
+    R"(<IRETURNVALUE><INSTANCENAME CLASSNAME="X_Disk"><KEYBINDING NAME="Number"><KEYVALUE VALUETYPE="numeric">7)"
+    R"(</KEYVALUE></KEYBINDING></INSTANCENAME></IRETURNVALUE>)";
+
+TEST(RemoteClass, IsAskedForWhereItIsNotKnownHere) {
+  const ScriptedServer server(
+      {ScriptedServer::cimReply(kDisk), ScriptedServer::cimReply(kDiskNames),
+       ScriptedServer::cimReply(R"(<IRETURNVALUE><INSTANCE CLASSNAME="X_Disk"><PROPERTY NAME="State" TYPE="uint8">)"
+                                "<VALUE>3</VALUE></PROPERTY></INSTANCE></IRETURNVALUE>")});
+  const Outcome outcome = TestHost().run({"gi", "x_disk", "--url", server.url()});
+  EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
+  EXPECT_EQ(outcome.out, "X_Disk.Number=7\n  State  3\n");
+  ASSERT_EQ(server.requests().size(), 3U);
+  EXPECT_THAT(server.requests()[0],
+              AllOf(HasSubstr("CIMMethod: GetClass\r\n"), HasSubstr("CIMObject: root/cimv2\r\n")));
+  EXPECT_THAT(server.requests()[2], HasSubstr(R"(<KEYVALUE VALUETYPE="numeric")"));
+}
+
+TEST(RemoteClass, GivesTheTypesOfMethodParameters) {
+  const ScriptedServer server(
+      {ScriptedServer::cimReply(kDisk), ScriptedServer::cimReply(kDiskNames),
+       ScriptedServer::reply(
+           R"(<CIM CIMVERSION="2.0" DTDVERSION="2.0"><MESSAGE ID="1" PROTOCOLVERSION="1.0"><SIMPLERSP>)"
+           R"(<METHODRESPONSE NAME="Spin"><RETURNVALUE PARAMTYPE="uint32"><VALUE>0</VALUE></RETURNVALUE>)"
+           "</METHODRESPONSE></SIMPLERSP></MESSAGE></CIM>")});
+  const Outcome outcome = TestHost().run({"cm", "X_Disk", "spin", "Speed=-5", "--url", server.url()});
+  EXPECT_EQ(outcome.out, "ReturnValue  0\n") << outcome.err;
+  ASSERT_EQ(server.requests().size(), 3U);
+  EXPECT_THAT(server.requests()[2],
+              AllOf(HasSubstr("CIMObject: root/cimv2:X_Disk.Number%3D7\r\n"),
+                    HasSubstr(R"(<PARAMVALUE NAME="Speed" PARAMTYPE="sint32"><VALUE>-5</VALUE></PARAMVALUE>)")));
+}
+
+TEST(RemoteClass, ThatTheServerLacksTooIsRefused) {
+  const ScriptedServer server({ScriptedServer::cimReply(R"(<ERROR CODE="6" DESCRIPTION="no"/>)")});
+  const Outcome outcome = TestHost().run({"ei", "X_Nothing", "--url", server.url()});
+  EXPECT_EQ(outcome.exitCode, 2);
+  EXPECT_THAT(outcome.err, HasSubstr("there is no class X_Nothing"));
+}
+
+}  // namespace
+}  // namespace zorva::cli

@@ -1,0 +1,148 @@
+#include "cli/RequestText.h"
+
+#include <charconv>
+
+#include "cimxml/ElementWriter.h"
+#include "schema/Declarations.h"
+
+namespace zorva::cli {
+
+namespace {
+
+constexpr std::string_view kBegin =
+    "<?xml version=\"1.0\" encoding=\"utf-8\"?>\n"
+    "<CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.3\"><MESSAGE ID=\"1\" PROTOCOLVERSION=\"1.0\"><SIMPLEREQ>";
+constexpr std::string_view kEnd = "</SIMPLEREQ></MESSAGE></CIM>\n";
+
+void appendNamed(std::string& out, std::string_view element, std::string_view name) {
+  out += '<';
+  out += element;
+  out += " NAME=\"";
+  cimxml::appendEscaped(out, name);
+  out += '"';
+}
+
+bool isPlain(char c) noexcept {
+  return (c >= '0' && c <= '9') || (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') ||
+         std::string_view("-._~/:").find(c) != std::string_view::npos;
+}
+
+}  // namespace
+
+IntrinsicCall::IntrinsicCall(std::string_view operation, std::string_view nameSpace) : text_(kBegin) {
+  appendNamed(text_, "IMETHODCALL", operation);
+  text_ += '>';
+  cimxml::appendLocalNamespacePath(text_, nameSpace);
+}
+
+void IntrinsicCall::begin(std::string_view parameter) {
+  appendNamed(text_, "IPARAMVALUE", parameter);
+  text_ += '>';
+}
+
+void IntrinsicCall::end() { text_ += "</IPARAMVALUE>"; }
+
+IntrinsicCall& IntrinsicCall::className(std::string_view parameter, std::string_view name) {
+  if (name.empty()) return *this;
+  begin(parameter);
+  appendNamed(text_, "CLASSNAME", name);
+  text_ += "/>";
+  end();
+  return *this;
+}
+
+IntrinsicCall& IntrinsicCall::instanceName(std::string_view parameter, const broker::ObjectPath& path) {
+  begin(parameter);
+  cimxml::appendInstanceName(text_, path);
+  end();
+  return *this;
+}
+
+IntrinsicCall& IntrinsicCall::text(std::string_view parameter, std::string_view value) {
+  if (value.empty()) return *this;
+  begin(parameter);
+  cimxml::appendValue(text_, broker::Value::text(std::string(value)));
+  end();
+  return *this;
+}
+
+IntrinsicCall& IntrinsicCall::boolean(std::string_view parameter, bool value) {
+  begin(parameter);
+  cimxml::appendValue(text_, broker::Value::boolean(value));
+  end();
+  return *this;
+}
+
+IntrinsicCall& IntrinsicCall::propertyList(const std::optional<std::vector<std::string>>& names) {
+  if (!names) return *this;
+  begin("PropertyList");
+  cimxml::appendValue(text_, broker::Value::textArray(*names));
+  end();
+  return *this;
+}
+
+IntrinsicCall& IntrinsicCall::modifiedInstance(const broker::Instance& instance) {
+  begin("ModifiedInstance");
+  text_ += "<VALUE.NAMEDINSTANCE>";
+  cimxml::appendInstanceName(text_, instance.path);
+  cimxml::appendInstance(text_, instance);
+  text_ += "</VALUE.NAMEDINSTANCE>";
+  end();
+  return *this;
+}
+
+std::string IntrinsicCall::message() {
+  text_ += "</IMETHODCALL>";
+  text_ += kEnd;
+  return std::move(text_);
+}
+
+std::string methodCall(const broker::ObjectPath& path, std::string_view method,
+                       const std::vector<broker::NamedValue>& input) {
+  std::string text(kBegin);
+  appendNamed(text, "METHODCALL", method);
+  text += "><LOCALINSTANCEPATH>";
+  cimxml::appendLocalNamespacePath(text, path.nameSpace);
+  cimxml::appendInstanceName(text, path);
+  text += "</LOCALINSTANCEPATH>";
+  for (const broker::NamedValue& each : input) {
+    appendNamed(text, "PARAMVALUE", each.name);
+    text += " PARAMTYPE=\"";
+    text += each.value.type == schema::Type::Reference ? "reference" : schema::typeName(each.value.type);
+    text += "\">";
+    cimxml::appendValue(text, each.value);
+    text += "</PARAMVALUE>";
+  }
+  text += "</METHODCALL>";
+  text += kEnd;
+  return text;
+}
+
+std::string fieldValue(std::string_view text) {
+  constexpr char kDigits[] = "0123456789ABCDEF";
+  std::string out;
+  for (const char c : text) {
+    const auto byte = static_cast<unsigned char>(c);
+    if (isPlain(c)) {
+      out += c;
+    } else {
+      out += {'%', kDigits[byte >> 4U], kDigits[byte & 15U]};
+    }
+  }
+  return out;
+}
+
+std::string fieldText(std::string_view value) {
+  std::string out;
+  while (!value.empty()) {
+    unsigned byte = 0;
+    const char* const digits = value.data() + 1;
+    const bool isEscape =
+        value.starts_with('%') && value.size() > 2 && std::from_chars(digits, digits + 2, byte, 16).ptr == digits + 2;
+    out += isEscape ? static_cast<char>(byte) : value.front();
+    value.remove_prefix(isEscape ? 3 : 1);
+  }
+  return out;
+}
+
+}  // namespace zorva::cli

@@ -1,0 +1,47 @@
+#pragma once
+
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "broker/Broker.h"
+
+// CIM-XML requests (DSP0201, operations of DSP0200) as they go to a server.
+
+namespace zorva::cli {
+
+/// The text of an intrinsic operation, built parameter by parameter. Names that are given empty are left out.
+class IntrinsicCall {
+ public:
+  IntrinsicCall(std::string_view operation, std::string_view nameSpace);
+
+  IntrinsicCall& className(std::string_view parameter, std::string_view name);
+  IntrinsicCall& instanceName(std::string_view parameter, const broker::ObjectPath& path);
+  IntrinsicCall& text(std::string_view parameter, std::string_view value);
+  IntrinsicCall& boolean(std::string_view parameter, bool value);
+  IntrinsicCall& propertyList(const std::optional<std::vector<std::string>>& names);
+  IntrinsicCall& modifiedInstance(const broker::Instance& instance);
+
+  /// The whole message. The call is used up.
+  std::string message();
+
+ private:
+  void begin(std::string_view parameter);
+  void end();
+
+  std::string text_;
+};
+
+/// The whole message of a call of an extrinsic method.
+std::string methodCall(const broker::ObjectPath& path, std::string_view method,
+                       const std::vector<broker::NamedValue>& input);
+
+/// A text as the value of a header field of DSP0200: "%" and two digits for each byte but letters, digits and some
+/// signs (DSP0200 7.3: such values are percent-encoded UTF-8).
+std::string fieldValue(std::string_view text);
+
+/// The text that fieldValue came from; a "%" that no two digits follow stands for itself.
+std::string fieldText(std::string_view value);
+
+}  // namespace zorva::cli

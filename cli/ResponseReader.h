@@ -1,0 +1,30 @@
+#pragma once
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "broker/Broker.h"
+
+// CIM-XML responses (DSP0201 2.x) as plain values.
+//
+// A server is not trusted: the text is read within bounds of depth, elements that are not known are passed over, and
+// what is no CIM-XML, or breaks off, is a Failure that names the place.
+
+namespace zorva::cli {
+
+/// What an operation gave back. Which of the lists has something in it depends on the operation.
+struct CimResponse {
+  broker::Status status;                    ///< what an ERROR element says
+  std::vector<broker::Instance> instances;  ///< with their paths, as far as the response has them
+  std::vector<broker::ObjectPath> paths;
+  std::vector<schema::ClassDeclaration> classes;
+  broker::MethodResult method;
+};
+
+/// Reads a whole response; `text` is used up. Where `classes` knows a class, keys get the types that it declares,
+/// and instances and properties refer to their declarations. What the response leaves out of a path is left empty.
+/// Throws Failure where the text is no CIM-XML response.
+CimResponse readResponse(std::string text, const schema::ClassRepository& classes);
+
+}  // namespace zorva::cli

@@ -1,0 +1,62 @@
+#pragma once
+
+#include <sys/types.h>
+
+#include <mutex>
+#include <string>
+#include <thread>
+#include <vector>
+
+// For tests of --url: the CIM server of this project on a test host, and a server that says what a test wants it to.
+
+namespace zorva::cli {
+
+class TestHost;
+
+/// zorvacimd, serving a test host on a port of its own while this lives.
+class TestServer {
+ public:
+  explicit TestServer(const TestHost& host);
+  ~TestServer();
+  TestServer(const TestServer&) = delete;
+  TestServer& operator=(const TestServer&) = delete;
+
+  /// "http://127.0.0.1:40000"; empty where it did not start.
+  const std::string& url() const { return url_; }
+
+ private:
+  pid_t process_ = -1;
+  std::string url_;
+};
+
+/// A server that gives these replies, whole texts of HTTP, one to each request, whatever that says; behind the last of
+/// them none. Each connection takes one request.
+class ScriptedServer {
+ public:
+  explicit ScriptedServer(std::vector<std::string> replies);
+  ~ScriptedServer();
+  ScriptedServer(const ScriptedServer&) = delete;
+  ScriptedServer& operator=(const ScriptedServer&) = delete;
+
+  std::string url() const;
+
+  /// The requests so far, with their header fields.
+  std::vector<std::string> requests() const;
+
+  /// A reply with this body, and further header fields, each ended by CRLF.
+  static std::string reply(const std::string& body, const std::string& status = "200 OK",
+                           const std::string& fields = {});
+
+  /// A reply with a CIM-XML response in it: what stands in an IMETHODRESPONSE.
+  static std::string cimReply(const std::string& content);
+
+ private:
+  void serve(std::vector<std::string> replies);
+
+  int listener_;
+  std::thread thread_;
+  mutable std::mutex mutex_;
+  std::vector<std::string> requests_;
+};
+
+}  // namespace zorva::cli

@@ -1,0 +1,41 @@
+// Any bytes as MOF. What is taken can be written down and read back to the same.
+#include <cstdint>
+#include <cstdio>
+#include <cstdlib>
+
+#include "schema/Mof.h"
+
+namespace {
+
+using namespace zorva::schema;  // NOLINT(google-build-using-namespace)
+
+std::string written(const ClassRepository& classes) {
+  std::string text;
+  for (const QualifierType* type : classes.qualifierTypes()) text += writeMof(*type);
+  for (const Class* one : classes.classes()) text += writeMof(one->declaration());
+  return text;
+}
+
+}  // namespace
+
+extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
+  const std::string_view text(reinterpret_cast<const char*>(data), size);
+  ClassRepository classes;
+  RepositorySink sink(classes);
+  if (const auto error = parseMof(text, "fuzz.mof", sink)) {
+    if (error->message.empty()) std::abort();
+    return 0;
+  }
+  const std::string first = written(classes);
+  ClassRepository again;
+  RepositorySink secondSink(again);
+  if (const auto error = parseMof(first, "written.mof", secondSink)) {
+    std::fprintf(stderr, "%s\n%s\n", error->text().c_str(), first.c_str());
+    std::abort();
+  }
+  if (written(again) != first) {
+    std::fprintf(stderr, "%s\n---\n%s\n", first.c_str(), written(again).c_str());
+    std::abort();
+  }
+  return 0;
+}

@@ -1,0 +1,78 @@
+#include "server/CommandLine.h"
+
+#include <CLI/CLI.hpp>
+#include <filesystem>
+
+#include "server/Listener.h"
+
+namespace zorva::server {
+
+namespace {
+
+constexpr const char* kExamples = R"(
+Examples:
+  zorvacimd                                     serve as /etc/zorvagent/zorvacimd.toml says
+  zorvacimd --port 0                            on a port that is free, and print it
+  zorvacimd --listen ::1 --log-level 4500       on one address, with a log line for each request
+  zorvacimd --config my.toml --check-config     is that configuration good?
+
+It listens on loopback addresses only. SIGHUP reads the configuration again, SIGTERM ends it when the requests in work
+are done. Exit status: 0 ended as it was told to, 1 it cannot serve, 2 wrong usage or configuration.)";
+
+void addOptions(CLI::App& app, CommandLine& line) {
+  app.add_option("--config", line.configFile, "The configuration (default: /etc/zorvagent/zorvacimd.toml)")
+      ->type_name("FILE");
+  app.add_option("--listen", line.addresses, "Listen on this loopback address; may be repeated")
+      ->type_name("ADDRESS")
+      ->allow_extra_args(false);
+  app.add_option("--port", line.port, "Listen on this port (default: 5988); 0 takes one that is free and prints it")
+      ->type_name("N")
+      ->check(CLI::Range(0, 65535));
+  app.add_option("--log-level", line.logLevel,
+                 "Log lines from this level on: 4500 each request, 5000 what was refused (the default), 6000 errors")
+      ->type_name("N");
+  app.add_option("--agent-config", line.agentConfig,
+                 "The agent's configuration (default: $ZORVAGENT_CONFIG, else /etc/zorvagent/agent.toml)")
+      ->type_name("FILE");
+  app.add_option("--provider-dir", line.providerDirectory, "Where the provider libraries lie")->type_name("DIR");
+  app.add_flag("--check-config", line.checkConfig, "Tell whether the configuration is good, and end");
+  app.add_flag("--greet", line.greet, "Print how to ask this server something, as on a terminal");
+}
+
+std::string absolute(const std::string& path) {
+  return path.empty() ? path : std::filesystem::absolute(path).string();
+}
+
+}  // namespace
+
+std::variant<CommandLine, Telling> readCommandLine(int argc, const char* const* argv) {
+  CommandLine line;
+  CLI::App app("A CIM server: CIM-XML over HTTP (DSP0200, DSP0201) for the DNS client configuration of this host.",
+               "zorvacimd");
+  app.set_version_flag("--version", std::string("zorvacimd ") + ZORVA_VERSION);
+  app.footer(kExamples);
+  addOptions(app, line);
+  try {
+    app.parse(argc, argv);
+  } catch (const CLI::CallForHelp&) {
+    return Telling{app.help(), false};
+  } catch (const CLI::CallForVersion& version) {
+    return Telling{std::string(version.what()) + "\n", false};
+  } catch (const CLI::ParseError& error) {
+    return Telling{std::string(error.what()) + "\nzorvacimd --help shows the usage", true};
+  }
+  return line;
+}
+
+Config configOf(const CommandLine& line) {
+  Config config = line.configFile.empty() ? readDefaultConfig() : readConfig(line.configFile);
+  if (line.addresses.has_value()) config.addresses = line.addresses;
+  if (line.port.has_value()) config.port = *line.port;
+  if (line.logLevel.has_value()) config.logLevel = *line.logLevel;
+  if (!line.agentConfig.empty()) config.agentConfig = absolute(line.agentConfig);
+  if (!line.providerDirectory.empty()) config.providerDirectory = absolute(line.providerDirectory);
+  if (config.addresses.has_value()) checkAddresses(*config.addresses);
+  return config;
+}
+
+}  // namespace zorva::server

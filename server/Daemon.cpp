@@ -1,0 +1,315 @@
+#include "server/Daemon.h"
+
+#include <malloc.h>
+#include <poll.h>
+#include <signal.h>
+#include <sys/resource.h>
+#include <sys/signalfd.h>
+#include <sys/socket.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <chrono>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <stdexcept>
+#include <utility>
+#include <vector>
+
+#include "agent/Agent.h"
+#include "schema/Schema.h"
+#include "server/HttpServer.h"
+#include "server/Interop.h"
+#include "server/Listener.h"
+#include "server/Log.h"
+#include "server/RequestHead.h"
+#include "server/Service.h"
+#include "server/Systemd.h"
+
+namespace zorva::server {
+
+namespace {
+
+constexpr int kServed = 0;
+constexpr int kCannotServe = 1;
+constexpr int kWrongUsage = 2;
+
+constexpr int kSweepMilliseconds = 200;
+constexpr int kQuietMilliseconds = 10'000;
+constexpr std::chrono::milliseconds kBeforeTrim{400};
+constexpr std::chrono::milliseconds kNoDescriptors{100};
+
+constexpr const char* kProfileLibrary = "libzorvadnsclientprofileprovider.so.1";
+
+/// Beside this program, as built or as installed. Empty leaves it to the dynamic loader.
+std::string defaultProviderDirectory() {
+  std::error_code ignored;
+  const std::filesystem::path program = std::filesystem::read_symlink("/proc/self/exe", ignored);
+  for (const char* libraries : {"lib", ZORVA_INSTALL_LIBDIR}) {
+    const std::filesystem::path directory = program.parent_path().parent_path() / libraries;
+    if (std::filesystem::exists(directory / kProfileLibrary, ignored)) return directory.string();
+  }
+  return {};
+}
+
+void tellError(const std::string& text) { std::fprintf(stderr, "zorvacimd: %s\n", text.c_str()); }
+
+/// Each connection is a descriptor. What the limits on descriptors leave no room for cannot be had.
+void makeRoomForConnections(HttpLimits& limits) {
+  constexpr rlim_t kOthers = 64;
+  rlimit files{};
+  if (::getrlimit(RLIMIT_NOFILE, &files) != 0) return;
+  if (files.rlim_cur < files.rlim_max) {
+    rlimit more = files;
+    more.rlim_cur = std::min<rlim_t>(files.rlim_max, std::max<rlim_t>(files.rlim_cur, limits.connections + kOthers));
+    if (::setrlimit(RLIMIT_NOFILE, &more) == 0) files = more;
+  }
+  const rlim_t room = files.rlim_cur > kOthers ? files.rlim_cur - kOthers : 1;
+  if (limits.connections <= room) return;
+  ZORVA_LOG(Warning, "of the connections configured, this process may have only " + std::to_string(room) + " open");
+  limits.connections = static_cast<std::size_t>(room);
+}
+
+sigset_t handledSignals() {
+  sigset_t signals;
+  ::sigemptyset(&signals);
+  for (const int each : {SIGTERM, SIGINT, SIGHUP}) ::sigaddset(&signals, each);
+  return signals;
+}
+
+void applyLog(const Config& config) {
+  zorvagent::setLogTarget(zorvagent::LogStream::Log,
+                          config.logTarget.value_or(zorvagent::currentConfig().logTarget));
+  setLogLevel(config.logLevel);
+}
+
+ServiceOptions serviceOptions(const Config& config) {
+  ServiceOptions options;
+  options.log = logBrokerLine;
+  options.maxDepth = static_cast<std::size_t>(config.nesting);
+  options.pullDefaultTimeout = std::chrono::seconds(config.pullSeconds);
+  options.pullMaxTimeout = std::chrono::seconds(config.pullLongestSeconds);
+  options.maxPulls = static_cast<std::size_t>(config.pullContexts);
+  options.maxPullBytes = static_cast<std::size_t>(config.pullMebibytes) << 20;
+  return options;
+}
+
+broker::Caller callerOf(const HttpRequest& request) {
+  broker::Caller caller;
+  if (const std::string* language = findHeader(request.headers, "Accept-Language")) caller.acceptLanguage = *language;
+  if (const std::string* language = findHeader(request.headers, "Content-Language")) {
+    caller.contentLanguage = *language;
+  }
+  return caller;
+}
+
+class Daemon {
+ public:
+  Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBroker);
+
+  /// Serves until a signal ends it. False: providers are stuck, and nothing may be destroyed.
+  bool run();
+
+ private:
+  using Clock = std::chrono::steady_clock;
+
+  void greet() const;
+  void acceptFrom(const Listener& listener);
+  bool handleSignal();
+  void reload();
+  void lookAfter();
+  int timeout() const;
+
+  const CommandLine commandLine_;
+  Config config_;
+  Descriptor signals_;
+  std::vector<Listener> listeners_;
+  std::unique_ptr<broker::Broker> broker_;
+  std::unique_ptr<Service> service_;
+  std::unique_ptr<HttpServer> server_;
+  Clock::time_point acceptAgain_{};
+  std::size_t requestsSeen_ = 0;     ///< when it was last looked
+  std::size_t requestsTrimmed_ = 0;  ///< when memory was last given back
+  Clock::time_point quietSince_ = Clock::now();
+};
+
+Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBroker)
+    : commandLine_(std::move(commandLine)), config_(std::move(config)) {
+  makeRoomForConnections(config_.limits);
+  const sigset_t signals = handledSignals();
+  ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);  // for all threads to come
+  ::signal(SIGPIPE, SIG_IGN);
+  signals_ = Descriptor(::signalfd(-1, &signals, SFD_NONBLOCK | SFD_CLOEXEC));
+  if (!signals_) throw std::runtime_error(std::string("cannot wait for signals: ") + std::strerror(errno));
+
+  const int inherited = countOfInheritedSockets();
+  listeners_ = inherited > 0 ? adoptListeners(inherited) : listenOn(config_.addresses, config_.port);
+  broker_ = makeBroker(config_);
+  service_ = std::make_unique<Service>(*broker_, serviceOptions(config_));
+  server_ = std::make_unique<HttpServer>(config_.limits, config_.threads,
+                                         [service = service_.get()](const HttpRequest& request, ResponseSink& sink) {
+                                           service->handle(request, sink, callerOf(request));
+                                         });
+}
+
+void Daemon::greet() const {
+  const bool isTerminal = ::isatty(STDOUT_FILENO) == 1;
+  if (!commandLine_.greet && !isTerminal && config_.port != 0) return;
+  std::string text = "zorvacimd listens on ";
+  for (const Listener& each : listeners_) text += (&each == listeners_.data() ? "" : " and ") + each.url;
+  text += '\n';
+  if (commandLine_.greet || isTerminal) {
+    const std::string& first = listeners_.front().url;
+    const std::string url = first.starts_with("http://127.0.0.1:") ? "http://localhost" + first.substr(16) : first;
+    text += "ask it:  wbemcli ein " + url + "/root/cimv2:ZORVA_DNSProtocolEndPoint\n";
+    text += "    or:  zorvactl --url " + url + "/root/cimv2 show\n";
+  }
+  std::fputs(text.c_str(), stdout);
+  std::fflush(stdout);
+}
+
+bool Daemon::run() {
+  std::vector<pollfd> waits{{signals_.get(), POLLIN, 0}};
+  for (const Listener& each : listeners_) waits.push_back({each.socket.get(), POLLIN, 0});
+  notifyServiceManager("READY=1");
+  greet();
+  for (;;) {
+    const bool accepts = Clock::now() >= acceptAgain_;
+    const int ready = ::poll(waits.data(), accepts ? waits.size() : 1, timeout());
+    if (ready > 0 && waits[0].revents != 0 && !handleSignal()) break;
+    for (std::size_t i = 1; ready > 0 && accepts && i < waits.size(); ++i) {
+      if (waits[i].revents != 0) acceptFrom(listeners_[i - 1]);
+    }
+    lookAfter();
+  }
+  notifyServiceManager("STOPPING=1");
+  listeners_.clear();
+  return server_->stop();
+}
+
+void Daemon::acceptFrom(const Listener& listener) {
+  constexpr int kAtOnce = 64;
+  for (int i = 0; i < kAtOnce; ++i) {
+    sockaddr_storage peer{};
+    socklen_t size = sizeof peer;
+    const int socket = ::accept4(listener.socket.get(), reinterpret_cast<sockaddr*>(&peer), &size,
+                                 SOCK_NONBLOCK | SOCK_CLOEXEC);
+    if (socket >= 0) {
+      server_->take(socket, peer, size);
+      continue;
+    }
+    if (errno == EMFILE || errno == ENFILE || errno == ENOBUFS || errno == ENOMEM) {
+      ZORVA_LOG_CLIENT(Error, std::string("no connection can be taken: ") + std::strerror(errno));
+      acceptAgain_ = Clock::now() + kNoDescriptors;
+    }
+    return;
+  }
+}
+
+/// False: it is to end.
+bool Daemon::handleSignal() {
+  signalfd_siginfo signal{};
+  if (::read(signals_.get(), &signal, sizeof signal) != static_cast<ssize_t>(sizeof signal)) return true;
+  if (signal.ssi_signo != SIGHUP) return false;
+  reload();
+  return true;
+}
+
+void Daemon::reload() try {
+  const auto now = std::chrono::duration_cast<std::chrono::microseconds>(Clock::now().time_since_epoch());
+  notifyServiceManager("RELOADING=1\nMONOTONIC_USEC=" + std::to_string(now.count()));
+  Config fresh = configOf(commandLine_);
+  zorvagent::loadConfig(fresh.agentConfig);
+  applyLog(fresh);
+  makeRoomForConnections(fresh.limits);
+  server_->setLimits(fresh.limits);
+  if (fresh.addresses != config_.addresses || fresh.port != config_.port || fresh.threads != config_.threads ||
+      fresh.nesting != config_.nesting || fresh.providerDirectory != config_.providerDirectory) {
+    ZORVA_LOG(Warning, "addresses, port, threads, nesting and provider directory change with the next start");
+  }
+  config_ = std::move(fresh);
+  ZORVA_LOG(Warning, "the configuration was read again");
+  notifyServiceManager("READY=1");
+} catch (const std::exception& error) {
+  ZORVA_LOG(Error, std::string("the configuration stays as it was: ") + error.what());
+  notifyServiceManager("READY=1");
+}
+
+/// What has to be done from time to time.
+void Daemon::lookAfter() {
+  server_->sweep();
+  service_->reclaim();
+  const std::size_t requests = server_->requestsTaken();
+  if (requests != requestsSeen_ || server_->hasWork()) {
+    requestsSeen_ = requests;
+    quietSince_ = Clock::now();
+  } else if (requests != requestsTrimmed_ && Clock::now() - quietSince_ > kBeforeTrim) {
+    // What large responses took is given back to the system.
+    requestsTrimmed_ = requests;
+    ::malloc_trim(0);
+  }
+}
+
+int Daemon::timeout() const {
+  if (server_->isBusy() || requestsTrimmed_ != server_->requestsTaken() || Clock::now() < acceptAgain_) {
+    return kSweepMilliseconds;
+  }
+  return requestsTrimmed_ == 0 ? -1 : kQuietMilliseconds;
+}
+
+int serve(const CommandLine& commandLine, const MakeBroker& makeBroker) {
+  Config config = configOf(commandLine);
+  if (commandLine.checkConfig) {
+    if (!config.agentConfig.empty()) zorvagent::readConfig(config.agentConfig);
+    std::printf("%s: good\n", config.file.empty() ? "the built-in configuration" : config.file.c_str());
+    return kServed;
+  }
+  // A few heaps for all threads: more would hold memory for each of them.
+  ::mallopt(M_ARENA_MAX, 2);
+  zorvagent::loadConfig(config.agentConfig);
+  applyLog(config);
+  auto daemon = std::make_unique<Daemon>(commandLine, std::move(config), makeBroker);
+  if (daemon->run()) return kServed;
+  ZORVA_LOG(Error, "ended while providers had not returned");
+  std::fflush(nullptr);
+  ::_exit(kServed);
+}
+
+}  // namespace
+
+std::unique_ptr<broker::Broker> makeBuiltInBroker(const Config& config) {
+  broker::BrokerOptions options;
+  options.providerDirectory = config.providerDirectory.empty() ? defaultProviderDirectory() : config.providerDirectory;
+  options.log = logBrokerLine;
+  serveInterop(options);
+  return std::make_unique<broker::Broker>(schema::loadBuiltInClasses(schema::ClassSet::Interop), std::move(options));
+}
+
+int runServer(int argc, const char* const* argv, const MakeBroker& makeBroker) {
+  const auto read = readCommandLine(argc, argv);
+  if (const auto* telling = std::get_if<Telling>(&read)) {
+    if (telling->isError) {
+      tellError(telling->text);
+      return kWrongUsage;
+    }
+    std::fputs(telling->text.c_str(), stdout);
+    return kServed;
+  }
+  try {
+    return serve(std::get<CommandLine>(read), makeBroker);
+  } catch (const zorvagent::ConfigError& error) {
+    tellError(error.what());
+    return kWrongUsage;
+  } catch (const std::invalid_argument& error) {
+    tellError(error.what());
+    return kWrongUsage;
+  } catch (const std::exception& error) {
+    tellError(error.what());
+    return kCannotServe;
+  }
+}
+
+}  // namespace zorva::server

@@ -1,0 +1,321 @@
+// zorvacimd as it runs: hostile requests, signals, sockets that are handed over, the word with the service manager.
+#include <arpa/inet.h>
+#include <fcntl.h>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <netinet/in.h>
+#include <signal.h>
+#include <sys/socket.h>
+#include <sys/un.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <cstring>
+#include <fstream>
+#include <thread>
+
+#include "server/TestDaemon.h"
+#include "server/TestWire.h"
+
+namespace zorva::server {
+namespace {
+
+using std::chrono::milliseconds;
+using std::chrono::seconds;
+using testing::TestDaemon;
+using testing::Wire;
+using testing::WireResponse;
+using ::testing::HasSubstr;
+using ::testing::StartsWith;
+
+const std::string kEndpoints = testing::enumeration("EnumerateInstanceNames", "ZORVA_DNSProtocolEndPoint");
+
+/// Asks for the endpoints; the names of the interfaces are in the answer.
+std::string endpoints(int port) {
+  Wire wire(port);
+  wire.send(kEndpoints);
+  return wire.receive().body;
+}
+
+TEST(Daemon, AnswersWithTheInstancesOfTheHost) {
+  const TestDaemon daemon;
+  const std::string answer = endpoints(daemon.port());
+  EXPECT_THAT(answer, HasSubstr("<INSTANCENAME CLASSNAME=\"ZORVA_DNSProtocolEndPoint\">"));
+  EXPECT_THAT(answer, HasSubstr(">eth0<"));
+  EXPECT_TRUE(daemon.logs("POST /cimom EnumerateInstanceNames: 200")) << daemon.log();
+}
+
+// ---- Hostile requests ----
+
+struct Hostile {
+  const char* name;
+  std::string bytes;
+  int status;              ///< 0: the connection is closed without an answer
+  const char* logged;      ///< part of a line of the log; null: none is made
+};
+
+std::string withHead(const std::string& fields, const std::string& body = {}) {
+  return "POST /cimom HTTP/1.1\r\nHost: x\r\n" + fields + "\r\n" + body;
+}
+
+std::vector<Hostile> hostileRequests() {
+  const std::string chunked = "Transfer-Encoding: chunked\r\n";
+  return {
+      {"TwoLengths", withHead("Content-Length: 4\r\nContent-Length: 5\r\n", "abcde"), 400, "Content-Length"},
+      {"TwoEqualLengths", withHead("Content-Length: 4\r\nContent-Length: 4\r\n", "abcd"), 400, "Content-Length"},
+      {"LengthAndChunks", withHead("Content-Length: 4\r\n" + chunked, "0\r\n\r\n"), 400, "Transfer-Encoding"},
+      {"ChunksTwice", withHead(chunked + chunked, "0\r\n\r\n"), 400, "Transfer-Encoding"},
+      {"ChunksAndMore", withHead("Transfer-Encoding: chunked, identity\r\n", "0\r\n\r\n"), 400, "chunked"},
+      {"HiddenChunks", withHead("Transfer-Encoding: xchunked\r\n", "0\r\n\r\n"), 400, "chunked"},
+      {"BlankBeforeTheColon", withHead("Content-Length : 4\r\n", "abcd"), 400, "400"},
+      {"SignedLength", withHead("Content-Length: +4\r\n", "abcd"), 400, "400"},
+      {"LengthsInOneField", withHead("Content-Length: 4, 4\r\n", "abcd"), 400, "400"},
+      {"BadChunkSize", withHead(chunked, "zz\r\nabc\r\n0\r\n\r\n"), 400, "400"},
+      {"NegativeChunk", withHead(chunked, "-3\r\nabc\r\n0\r\n\r\n"), 400, "400"},
+      {"ChunkLongerThanSaid", withHead(chunked, "3\r\nabcdef\r\n0\r\n\r\n"), 400, "400"},
+      {"HugeChunk", withHead(chunked, "ffffffffffffffffff\r\n"), 413, "413"},
+      {"HugeLength", withHead("Content-Length: 123456789012\r\n"), 413, "413"},
+      {"NoHost", "POST /cimom HTTP/1.1\r\nContent-Length: 0\r\n\r\n", 400, "400"},
+      {"TwoHosts", withHead("Host: y\r\nContent-Length: 0\r\n"), 400, "Host"},
+      {"NoLength", withHead(""), 411, "411"},
+      {"OtherCharset", withHead("Content-Type: text/xml; charset=utf-16\r\nContent-Length: 0\r\n"), 400, "charset"},
+      {"OtherContent", withHead("Content-Type: application/json\r\nContent-Length: 0\r\n"), 415, "415"},
+      {"CimHeaderTwice",
+       withHead("CIMObject: root/cimv2\r\nCIMObject: interop\r\nContent-Type: text/xml\r\nContent-Length: 0\r\n"), 400,
+       "CIMObject"},
+      {"HugeHeader", withHead("X: " + std::string(70'000, 'x') + "\r\nContent-Length: 0\r\n"), 431, "431"},
+      {"HugePath", "POST /" + std::string(70'000, 'x') + " HTTP/1.1\r\nHost: x\r\n\r\n", 414, "414"},
+      {"ManyHeaders", withHead([] {
+         std::string fields;
+         for (int i = 0; i < 5000; ++i) fields += "X-" + std::to_string(i) + ": 1\r\n";
+         return fields;
+       }()),
+       431, "431"},
+      {"NoHttp", std::string("\x16\x03\x01\x02\x00\x01\x00\x01\xfc\x03\x03\r\n\r\n", 15), -1, nullptr},
+      {"OtherVersion", "POST /cimom HTTP/3.0\r\nHost: x\r\nContent-Length: 0\r\n\r\n", 505, nullptr},
+  };
+}
+
+TEST(HostileRequests, EachGetsItsAnswerAndALineAndTheServerGoesOn) {
+  const TestDaemon daemon("[limits]\nheader_kib = 32\n");
+  for (const Hostile& hostile : hostileRequests()) {
+    SCOPED_TRACE(hostile.name);
+    const std::size_t logged = daemon.log().size();
+    Wire wire(daemon.port());
+    // The answer may come, and the connection go, before all of it is sent.
+    wire.send(hostile.bytes);
+    const WireResponse response = wire.receive(seconds(5));
+    if (hostile.status >= 0) {
+      EXPECT_EQ(response.status, hostile.status) << response.body;
+    }
+    EXPECT_TRUE(wire.isClosedWithin(seconds(5))) << "nothing that follows is taken for a request";
+    if (hostile.logged != nullptr) {
+      std::string lines;
+      for (int i = 0; i < 200 && lines.find(hostile.logged) == std::string::npos; ++i) {
+        if (i > 0) std::this_thread::sleep_for(milliseconds(10));
+        lines = daemon.log().substr(logged);
+      }
+      EXPECT_THAT(lines, HasSubstr(hostile.logged));
+    }
+    std::this_thread::sleep_for(milliseconds(60));  // only so many such lines are written in a second
+  }
+  EXPECT_THAT(endpoints(daemon.port()), HasSubstr("eth0"));
+}
+
+TEST(HostileRequests, ATruncatedRequestIsNoneAndIsLogged) {
+  const TestDaemon daemon;
+  for (std::size_t size = 1; size < kEndpoints.size(); size += 37) {
+    Wire wire(daemon.port());
+    wire.send(kEndpoints.substr(0, size));
+  }
+  EXPECT_TRUE(daemon.logs("the connection ended within a request")) << daemon.log();
+  EXPECT_THAT(endpoints(daemon.port()), HasSubstr("eth0"));
+}
+
+TEST(HostileRequests, ARefusedCimHeaderIsNamedInCIMError) {
+  const TestDaemon daemon;
+  Wire wire(daemon.port());
+  wire.send(testing::posting("<CIM/>", "CIMObject: a\r\nCIMObject: b\r\n"));
+  const WireResponse response = wire.receive();
+  EXPECT_EQ(response.status, 400);
+  EXPECT_EQ(response.headers.at("cimerror"), "header-mismatch");
+}
+
+TEST(HostileRequests, AFloodOfThemDoesNotFillTheLog) {
+  const TestDaemon daemon;
+  for (int i = 0; i < 300; ++i) {
+    Wire wire(daemon.port());
+    wire.send("GET / HTTP/1.1\r\nHost: x\r\n\r\n");
+    EXPECT_EQ(wire.receive().status, 405);
+  }
+  const std::string log = daemon.log();
+  EXPECT_LT(std::count(log.begin(), log.end(), '\n'), 200);
+}
+
+// ---- The process ----
+
+TEST(DaemonProcess, RefusesOtherThanLoopbackAddresses) {
+  const auto outcome = TestDaemon::run({"--listen", "0.0.0.0"});
+  EXPECT_EQ(outcome.exitCode, 2);
+  EXPECT_THAT(outcome.err, HasSubstr("'0.0.0.0' is no loopback address"));
+  const auto name = TestDaemon::run({"--listen", "localhost"});
+  EXPECT_EQ(name.exitCode, 2);
+  EXPECT_THAT(name.err, HasSubstr("'localhost' is no address"));
+}
+
+TEST(DaemonProcess, ChecksAConfiguration) {
+  const zorvagent::testing::TemporaryDirectory directory;
+  const std::string good = directory.write("good.toml", "[listen]\nport = 1\n");
+  const std::string bad = directory.write("bad.toml", "\n[limits]\nbody = 1\n");
+  const auto fine = TestDaemon::run({"--config", good, "--check-config"});
+  EXPECT_EQ(fine.exitCode, 0);
+  EXPECT_THAT(fine.out, HasSubstr("good.toml: good"));
+  const auto wrong = TestDaemon::run({"--config", bad, "--check-config"});
+  EXPECT_EQ(wrong.exitCode, 2);
+  EXPECT_THAT(wrong.err, HasSubstr("bad.toml:3: limits.body: is not a known key"));
+}
+
+TEST(DaemonProcess, SaysWhatIsWrongWithAPortThatIsTaken) {
+  const TestDaemon daemon;
+  const auto outcome = TestDaemon::run({"--listen", "127.0.0.1", "--port", std::to_string(daemon.port())});
+  EXPECT_EQ(outcome.exitCode, 1);
+  EXPECT_THAT(outcome.err, HasSubstr("cannot listen on 127.0.0.1 port " + std::to_string(daemon.port())));
+}
+
+TEST(DaemonProcess, ListensOnBothAddressesWhereNoneIsGiven) {
+  const TestDaemon daemon({}, {"--port", "0"});
+  EXPECT_THAT(endpoints(daemon.port()), HasSubstr("eth0"));
+}
+
+TEST(DaemonProcess, EndsAtASignal) {
+  for (const int signal : {SIGTERM, SIGINT}) {
+    TestDaemon daemon;
+    EXPECT_THAT(endpoints(daemon.port()), HasSubstr("eth0"));
+    const Wire open(daemon.port());
+    daemon.signal(signal);
+    EXPECT_EQ(daemon.exitCodeWithin(seconds(20)), 0);
+  }
+}
+
+TEST(DaemonProcess, ReadsItsConfigurationAgain) {
+  TestDaemon daemon("[limits]\nbody_kib = 4\n");
+  const std::string request = testing::posting(std::string(5000, 'x'), "CIMOperation: MethodCall\r\n");
+  Wire before(daemon.port());
+  before.send(request);
+  EXPECT_EQ(before.receive().status, 413);
+
+  daemon.writeConfig("[limits]\nbody_kib = 8\n");
+  daemon.signal(SIGHUP);
+  ASSERT_TRUE(daemon.logs("the configuration was read again"));
+  Wire after(daemon.port());
+  after.send(request);
+  EXPECT_NE(after.receive().status, 413);
+
+  daemon.writeConfig("[limits]\nbody_kip = 8\n");
+  daemon.signal(SIGHUP);
+  EXPECT_TRUE(daemon.logs("zorvacimd.toml:8: limits.body_kip: is not a known key")) << daemon.log();
+  EXPECT_THAT(endpoints(daemon.port()), HasSubstr("eth0"));
+}
+
+TEST(DaemonProcess, MovesToANewLogFileWhenItReadsItsConfigurationAgain) {
+  const TestDaemon daemon;
+  ASSERT_THAT(endpoints(daemon.port()), HasSubstr("eth0"));
+  ASSERT_TRUE(daemon.logs("EnumerateInstanceNames: 200"));
+  ASSERT_EQ(::rename((daemon.directory() / "log").c_str(), (daemon.directory() / "log.1").c_str()), 0);
+  daemon.signal(SIGHUP);
+  EXPECT_TRUE(daemon.logs("the configuration was read again"));
+}
+
+/// A datagram socket in the place of a service manager's.
+class NotifySocket {
+ public:
+  NotifySocket() : path_(directory_ / "notify"), socket_(::socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0)) {
+    sockaddr_un address{};
+    address.sun_family = AF_UNIX;
+    std::strncpy(address.sun_path, path_.c_str(), sizeof address.sun_path - 1);
+    EXPECT_EQ(::bind(socket_.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address), 0);
+    const timeval most{20, 0};
+    ::setsockopt(socket_.get(), SOL_SOCKET, SO_RCVTIMEO, &most, sizeof most);
+  }
+  const std::string& path() const { return path_; }
+  std::string next() const {
+    char buffer[256];
+    const ssize_t got = ::recv(socket_.get(), buffer, sizeof buffer, 0);
+    return got < 0 ? "nothing" : std::string(buffer, static_cast<std::size_t>(got));
+  }
+
+ private:
+  zorvagent::testing::TemporaryDirectory directory_;
+  std::string path_;
+  Descriptor socket_;
+};
+
+TEST(DaemonProcess, TellsTheServiceManagerHowItFares) {
+  const NotifySocket manager;
+  TestDaemon daemon({}, {"--listen", "127.0.0.1", "--port", "0"},
+                    [&] { ::setenv("NOTIFY_SOCKET", manager.path().c_str(), 1); });
+  EXPECT_EQ(manager.next(), "READY=1");
+  daemon.signal(SIGHUP);
+  EXPECT_THAT(manager.next(), StartsWith("RELOADING=1\nMONOTONIC_USEC="));
+  EXPECT_EQ(manager.next(), "READY=1");
+  daemon.signal(SIGTERM);
+  EXPECT_EQ(manager.next(), "STOPPING=1");
+  EXPECT_EQ(daemon.exitCodeWithin(seconds(20)), 0);
+}
+
+/// Listens on an address and hands that on as descriptor 3, as a service manager does.
+void handOver(const char* address) {
+  const int socket = ::socket(AF_INET, SOCK_STREAM, 0);
+  sockaddr_in name{};
+  name.sin_family = AF_INET;
+  ::inet_pton(AF_INET, address, &name.sin_addr);
+  ::bind(socket, reinterpret_cast<const sockaddr*>(&name), sizeof name);
+  ::listen(socket, 16);
+  ::dup2(socket, 3);
+  ::setenv("LISTEN_PID", std::to_string(::getpid()).c_str(), 1);
+  ::setenv("LISTEN_FDS", "1", 1);
+}
+
+TEST(DaemonProcess, TakesASocketThatIsHandedOver) {
+  const TestDaemon daemon({}, {"--log-level", "4500"}, [] { handOver("127.0.0.1"); });
+  EXPECT_NE(daemon.port(), 5988);
+  EXPECT_THAT(endpoints(daemon.port()), HasSubstr("eth0"));
+}
+
+TEST(DaemonProcess, TakesNoSocketThatOthersCanReach) {
+  try {
+    const TestDaemon daemon({}, {"--log-level", "4500"}, [] { handOver("0.0.0.0"); });
+    ADD_FAILURE() << "it serves on port " << daemon.port();
+  } catch (const std::runtime_error& error) {
+    EXPECT_THAT(error.what(), HasSubstr("listens elsewhere than on a loopback address"));
+  }
+}
+
+/// The resident memory of a process in KiB.
+long residentKib(pid_t process) {
+  std::ifstream status("/proc/" + std::to_string(process) + "/status");
+  std::string line;
+  while (std::getline(status, line)) {
+    if (line.starts_with("VmRSS:")) return std::atol(line.c_str() + 6);
+  }
+  return 0;
+}
+
+TEST(DaemonProcess, AThousandHalfOpenClientsCostLittleMemoryAndNoDescriptors) {
+  const TestDaemon daemon("[limits]\nconnections = 300\n");
+  std::vector<std::unique_ptr<Wire>> slow;
+  for (int i = 0; i < 1000; ++i) {
+    slow.push_back(std::make_unique<Wire>(daemon.port()));
+    slow.back()->send("POST /cimom HTTP/1.1\r\nHost: x\r\nContent-Length: 1000\r\n\r\n<CIM");
+    if (i % 100 != 0) continue;
+    EXPECT_THAT(endpoints(daemon.port()), HasSubstr("eth0")) << i;
+  }
+  EXPECT_THAT(endpoints(daemon.port()), HasSubstr("eth0"));
+  EXPECT_GT(residentKib(daemon.process()), 0);
+#if !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
+  EXPECT_LT(residentKib(daemon.process()), 60'000);
+#endif
+}
+
+}  // namespace
+}  // namespace zorva::server

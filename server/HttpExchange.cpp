@@ -1,0 +1,317 @@
+#include "server/HttpExchange.h"
+
+#include <sched.h>
+
+#include <algorithm>
+#include <utility>
+
+namespace zorva::server {
+
+namespace {
+
+constexpr std::size_t kWorthWaking = std::size_t{32} << 10;
+constexpr std::size_t kWorthCompressing = 1024;
+constexpr std::size_t kBlock = std::size_t{16} << 10;
+
+/// A description as a header field's value: printable ASCII, the rest percent-encoded (DSP0200 7.3.7).
+std::string fieldText(std::string_view text) {
+  constexpr char kDigits[] = "0123456789ABCDEF";
+  constexpr std::size_t kLongest = 1000;
+  std::string value;
+  for (const char c : text.substr(0, kLongest)) {
+    const auto byte = static_cast<unsigned char>(c);
+    if (byte >= 0x20 && byte < 0x7F && c != '%') {
+      value += c;
+    } else {
+      value += '%';
+      value += kDigits[byte >> 4];
+      value += kDigits[byte & 0x0F];
+    }
+  }
+  return value;
+}
+
+}  // namespace
+
+HttpExchange::HttpExchange(MHD_Connection* connection, std::shared_ptr<Connection> client_, std::string path)
+    : client(std::move(client_)), connection_(connection) {
+  request.path = std::move(path);
+}
+
+// ---- The worker ----
+
+void HttpExchange::start(WaitListener& waits) {
+  const std::lock_guard lock(mutex_);
+  waits_ = &waits;
+  started_ = Clock::now();
+}
+
+void HttpExchange::begin(int status, const HeaderList& headers) {
+  const std::lock_guard lock(mutex_);
+  if (gone_ || givenUp_) throw ClientGone("nobody waits for the response");
+  status_ = status;
+  headers_ = headers;
+  begun_ = true;
+}
+
+void HttpExchange::write(std::string_view text) {
+  std::unique_lock lock(mutex_);
+  while (!text.empty()) {
+    if (gone_ || givenUp_) throw ClientGone("nobody waits for the rest of the response");
+    const std::string_view piece = text.substr(0, kWhole);
+    text.remove_prefix(piece.size());
+    append(piece);
+    if (!streaming_ && held_.size() > kWhole) startStreaming();
+    if (!streaming_) continue;
+    if (held_.size() >= kWorthWaking) wake();
+    waitForClient(lock);
+  }
+}
+
+void HttpExchange::fail(std::uint32_t cimStatus, std::string_view description) {
+  const std::lock_guard lock(mutex_);
+  if (gone_ || givenUp_ || complete_) return;
+  failed_ = true;
+  cimStatus_ = cimStatus;
+  description_ = description;
+  if (!streaming_) startStreaming();
+}
+
+bool HttpExchange::begun() const {
+  const std::lock_guard lock(mutex_);
+  return begun_;
+}
+
+void HttpExchange::finish(const Refusal& orElse) {
+  const std::lock_guard lock(mutex_);
+  if (gone_ || complete_) return;
+  if (!begun_) {
+    status_ = orElse.status;
+    headers_ = headersOf(orElse);
+    held_ = textOf(orElse);
+  }
+  complete();
+}
+
+void HttpExchange::append(std::string_view text) {
+  if (gzip_ != nullptr) {
+    gzip_->add(text, held_);
+  } else {
+    held_ += text;
+  }
+}
+
+void HttpExchange::startStreaming() {
+  streaming_ = true;
+  if (takesGzip) {
+    gzip_ = std::make_unique<Gzip>();
+    const std::string plain = std::exchange(held_, {});
+    gzip_->add(plain, held_);
+  }
+  publish();
+}
+
+// No more than one thread is ever behind the lock here, the one that works on this request.
+void HttpExchange::waitForClient(std::unique_lock<std::mutex>& lock) {
+  if (held_.size() < kMostHeld || gone_ || givenUp_) return;
+  waitingSince_ = Clock::now();
+  if (waits_ != nullptr) waits_->waitsForClient();
+  room_.wait(lock, [this] { return held_.size() < kMostHeld || gone_ || givenUp_; });
+  if (started_.has_value()) *started_ += Clock::now() - *waitingSince_;
+  waitingSince_.reset();
+  if (waits_ != nullptr) waits_->goesOn();
+}
+
+void HttpExchange::complete() {
+  complete_ = true;
+  if (!streaming_ && takesGzip && held_.size() >= kWorthCompressing) {
+    gzip_ = std::make_unique<Gzip>();
+    const std::string plain = std::exchange(held_, {});
+    gzip_->add(plain, held_);
+  }
+  if (gzip_ != nullptr) gzip_->finish(held_);
+  published_ ? wake() : publish();
+}
+
+void HttpExchange::publish() {
+  published_ = true;
+  wake();
+}
+
+void HttpExchange::wake() {
+  if (!suspended_ || gone_) return;
+  suspended_ = false;
+  MHD_resume_connection(connection_);
+}
+
+// ---- Any thread ----
+
+HttpExchange::Clock::duration HttpExchange::worked() const {
+  const std::lock_guard lock(mutex_);
+  if (!started_.has_value() || complete_) return {};
+  return waitingSince_.value_or(Clock::now()) - *started_;
+}
+
+HttpExchange::Clock::duration HttpExchange::waiting() const {
+  const std::lock_guard lock(mutex_);
+  if (!waitingSince_.has_value()) return {};
+  return Clock::now() - *waitingSince_;
+}
+
+namespace {
+
+/// Keeps a short response.
+class TextSink : public ResponseSink {
+ public:
+  void begin(int status, const HeaderList& headers) override {
+    status_ = status;
+    headers_ = headers;
+  }
+  void write(std::string_view text) override { text_ += text; }
+  void fail(std::uint32_t, std::string_view) override {}
+  bool begun() const override { return status_ != 0; }
+
+  int status_ = 0;
+  HeaderList headers_;
+  std::string text_;
+};
+
+}  // namespace
+
+bool HttpExchange::giveUp(const std::function<void(ResponseSink&)>& answer) {
+  TextSink other;
+  answer(other);
+  const std::lock_guard lock(mutex_);
+  if (gone_ || complete_ || givenUp_) return false;
+  givenUp_ = true;
+  if (published_) {
+    constexpr std::uint32_t kFailed = 1;  // CIM_ERR_FAILED
+    failed_ = true;
+    cimStatus_ = kFailed;
+    description_ = "the request was given up";
+  } else {
+    begun_ = true;
+    status_ = other.status_;
+    headers_ = std::move(other.headers_);
+    held_ = std::move(other.text_);
+  }
+  complete();
+  room_.notify_all();
+  return true;
+}
+
+// ---- The event thread ----
+
+// A response is mostly there sooner than the connection could be taken out of the event loop and put back into it, and
+// sooner than a sleeping thread wakes up. Others have the processor meanwhile.
+bool HttpExchange::awaitOrSuspend(std::chrono::microseconds moment) {
+  const auto deadline = Clock::now() + moment;
+  while (moment.count() > 0 && !published_.load(std::memory_order_acquire) && Clock::now() < deadline) ::sched_yield();
+  const std::lock_guard lock(mutex_);
+  if (published_) return true;
+  suspended_ = true;
+  MHD_suspend_connection(connection_);
+  return false;
+}
+
+bool HttpExchange::isPublished() const {
+  return published_.load(std::memory_order_acquire);
+}
+
+MHD_Result HttpExchange::respond() {
+  response_ = makeResponse();
+  if (response_ == nullptr) return MHD_NO;
+  addHeaders(*response_);
+  client->enter(Phase::Sending);
+  const MHD_Result queued = MHD_queue_response(connection_, static_cast<unsigned int>(status_), response_);
+  MHD_destroy_response(response_);  // the connection has a share of its own
+  return queued;
+}
+
+MHD_Response* HttpExchange::makeResponse() {
+  const std::lock_guard lock(mutex_);
+  if (streaming_) {
+    return MHD_create_response_from_callback(MHD_SIZE_UNKNOWN, kBlock, &HttpExchange::fillResponse, this, nullptr);
+  }
+  // Nobody adds to it any more, and it lives until the HTTP library is done.
+  bytesSent_ = held_.size();
+  return MHD_create_response_from_buffer(held_.size(), held_.data(), MHD_RESPMEM_PERSISTENT);
+}
+
+void HttpExchange::addHeaders(MHD_Response& response) const {
+  for (const auto& [name, value] : headers_) MHD_add_response_header(&response, name.c_str(), value.c_str());
+  if (gzip_ != nullptr) MHD_add_response_header(&response, MHD_HTTP_HEADER_CONTENT_ENCODING, "gzip");
+  if (streaming_ && request.takesTrailers && isHttp11) {
+    MHD_add_response_header(&response, MHD_HTTP_HEADER_TRAILER, "CIMStatusCode, CIMStatusCodeDescription");
+  }
+}
+
+ssize_t HttpExchange::fillResponse(void* exchange, std::uint64_t, char* buffer, std::size_t most) {
+  return static_cast<HttpExchange*>(exchange)->fill(buffer, most);
+}
+
+ssize_t HttpExchange::fill(char* buffer, std::size_t most) {
+  if (taken_ == outgoing_.size()) {
+    const std::lock_guard lock(mutex_);
+    outgoing_.clear();
+    taken_ = 0;
+    outgoing_.swap(held_);
+    if (outgoing_.empty()) {
+      if (complete_) return endOfStream();
+      // The worker wakes it under the same lock.
+      suspended_ = true;
+      client->enter(Phase::Working);
+      MHD_suspend_connection(connection_);
+      return 0;
+    }
+    room_.notify_all();
+  }
+  client->enter(Phase::Sending);
+  const std::size_t size = std::min(most, outgoing_.size() - taken_);
+  outgoing_.copy(buffer, size, taken_);
+  taken_ += size;
+  bytesSent_ += size;
+  return static_cast<ssize_t>(size);
+}
+
+ssize_t HttpExchange::endOfStream() {
+  if (!failed_) return MHD_CONTENT_READER_END_OF_STREAM;
+  if (!request.takesTrailers || !isHttp11) return MHD_CONTENT_READER_END_WITH_ERROR;
+  MHD_add_response_footer(response_, "CIMStatusCode", std::to_string(cimStatus_).c_str());
+  MHD_add_response_footer(response_, "CIMStatusCodeDescription", fieldText(description_).c_str());
+  return MHD_CONTENT_READER_END_OF_STREAM;
+}
+
+void HttpExchange::ended() {
+  const std::lock_guard lock(mutex_);
+  gone_ = true;
+  room_.notify_all();
+}
+
+// ---- Refusals ----
+
+HeaderList headersOf(const Refusal& refusal) {
+  HeaderList headers{{MHD_HTTP_HEADER_CONTENT_TYPE, "text/plain; charset=utf-8"}};
+  if (!refusal.cimError.empty()) headers.emplace_back("CIMError", refusal.cimError);
+  if (refusal.status == 405 || refusal.status == 501) headers.emplace_back(MHD_HTTP_HEADER_ALLOW, kAllowedMethods);
+  if (refusal.status == 503) headers.emplace_back(MHD_HTTP_HEADER_RETRY_AFTER, "1");
+  return headers;
+}
+
+std::string textOf(const Refusal& refusal) { return refusal.why + "\n"; }
+
+MHD_Result respondWith(MHD_Connection* connection, const Refusal& refusal) {
+  const std::string text = textOf(refusal);
+  MHD_Response* response =
+      MHD_create_response_from_buffer(text.size(), const_cast<char*>(text.data()), MHD_RESPMEM_MUST_COPY);
+  if (response == nullptr) return MHD_NO;
+  for (const auto& [name, value] : headersOf(refusal)) {
+    MHD_add_response_header(response, name.c_str(), value.c_str());
+  }
+  MHD_add_response_header(response, MHD_HTTP_HEADER_CONNECTION, "close");
+  const MHD_Result queued = MHD_queue_response(connection, static_cast<unsigned int>(refusal.status), response);
+  MHD_destroy_response(response);
+  return queued;
+}
+
+}  // namespace zorva::server

@@ -1,0 +1,129 @@
+#include "server/Operations.h"
+
+#include "broker/PathText.h"
+#include "cimxml/ElementWriter.h"
+#include "cmpidt.h"
+
+namespace zorva::server {
+
+namespace {
+
+using broker::Status;
+
+/// Operations that DSP0200 has and this server does not offer.
+constexpr std::pair<std::string_view, const char*> kNotOffered[] = {
+    {"CreateClass", "the classes are built in and cannot be changed"},
+    {"ModifyClass", "the classes are built in and cannot be changed"},
+    {"DeleteClass", "the classes are built in and cannot be changed"},
+    {"SetQualifier", "the qualifier types are built in and cannot be changed"},
+    {"DeleteQualifier", "the qualifier types are built in and cannot be changed"},
+    {"ExecQuery", "queries are not offered; enumerate the class and choose among its instances"},
+    {"OpenQueryInstances", "queries are not offered; use OpenEnumerateInstances"},
+    {"PullInstances", "queries are not offered, and so are their results; use PullInstancesWithPath"},
+};
+
+Status notOffered(const std::string& name) {
+  for (const auto& [known, why] : kNotOffered) {
+    if (schema::sameName(known, name)) return {CMPI_RC_ERR_NOT_SUPPORTED, std::string(known) + ": " + why};
+  }
+  return {CMPI_RC_ERR_NOT_SUPPORTED, "there is no operation " + broker::quotedText(name.substr(0, 80))};
+}
+
+OperationFunction findOperation(std::string_view name) noexcept {
+  for (const auto find : {findInstanceOperation, findAssociationOperation, findClassOperation, findPullOperation}) {
+    if (const OperationFunction found = find(name)) return found;
+  }
+  return nullptr;
+}
+
+/// CMPI has codes that CIM lacks.
+Status asCim(Status status) {
+  constexpr int kLastOfCim = 29;
+  if (status.rc >= 0 && status.rc <= kLastOfCim) return status;
+  const std::string name(broker::statusName(status.rc));
+  return {CMPI_RC_ERR_FAILED, status.message.empty() ? name : status.message + " (" + name + ")"};
+}
+
+}  // namespace
+
+Status carryOut(Operation& operation) {
+  const cimxml::Call& call = operation.call;
+  const OperationFunction function = call.isExtrinsic ? invokeMethod : findOperation(call.name);
+  if (function == nullptr) return notOffered(call.name);
+  operation.nameSpace = operation.broker.registry().nameSpace(call.target.nameSpace);
+  if (operation.nameSpace.empty()) {
+    return {CMPI_RC_ERR_INVALID_NAMESPACE,
+            "there is no namespace " + broker::quotedText(call.target.nameSpace.substr(0, 200))};
+  }
+  return asCim(function(operation));
+}
+
+void settleValue(const Operation& operation, broker::Value& value) {
+  const auto settle = [&](broker::Scalar& scalar) {
+    if (auto* reference = std::get_if<broker::Boxed<broker::ObjectPath>>(&scalar)) {
+      broker::ObjectPath& path = **reference;
+      if (operation.host.isThis(path.host, operation.hostHeader)) path.host.clear();
+      for (broker::NamedValue& key : path.keys) settleValue(operation, key.value);
+    }
+  };
+  settle(value.scalar);
+  for (broker::Scalar& element : value.elements) settle(element);
+}
+
+namespace {
+
+/// Providers name the host of what they give as they name the computer system, which may be configured.
+bool isNameOfASystem(const Operation& operation, std::string_view host) {
+  bool found = false;
+  const broker::PathSink look = [&](const broker::ObjectPath& path) {
+    const broker::Value* name = path.key("Name");
+    found = found || (name != nullptr && schema::sameName(name->asText(), host));
+    return !found;
+  };
+  operation.broker.enumerateInstanceNames({}, "CIM_ComputerSystem", look, operation.caller);
+  return found;
+}
+
+}  // namespace
+
+Status settlePath(const Operation& operation, broker::ObjectPath& path) {
+  if (!path.host.empty() && !operation.host.isThis(path.host, operation.hostHeader) &&
+      !isNameOfASystem(operation, path.host)) {
+    return {CMPI_RC_ERR_INVALID_PARAMETER,
+            "the path is of the host " + broker::quotedText(path.host.substr(0, 200)) + ", which is not this one"};
+  }
+  path.host.clear();
+  path.nameSpace = operation.nameSpace;
+  for (broker::NamedValue& key : path.keys) {
+    settleValue(operation, key.value);
+    if (!key.name.empty()) continue;
+    const schema::Class* declared = operation.classes().find(path.className);
+    if (declared == nullptr) continue;  // which the broker says
+    if (declared->keys().size() != 1) {
+      return {CMPI_RC_ERR_INVALID_PARAMETER,
+              declared->name() + " has " + std::to_string(declared->keys().size()) + " keys, so each needs its name"};
+    }
+    key.name = declared->keys().front()->name;
+  }
+  return {};
+}
+
+Status invokeMethod(Operation& operation) {
+  broker::ObjectPath path = operation.call.target;
+  Status status = settlePath(operation, path);
+  if (!status.ok()) return status;
+  std::vector<broker::NamedValue> input = operation.call.input;
+  for (broker::NamedValue& argument : input) settleValue(operation, argument.value);
+  broker::MethodResult result;
+  status = operation.broker.invokeMethod(path, operation.call.name, input, result, operation.caller);
+  if (!status.ok()) return status;
+  std::string& out = operation.writer.out();
+  if (!result.returnValue.isNull) cimxml::appendReturnValue(out, result.returnValue);
+  for (const broker::NamedValue& value : result.output) {
+    cimxml::appendParameter(out, value);
+    operation.writer.settle();
+  }
+  return {};
+}
+
+}  // namespace zorva::server

@@ -1,0 +1,124 @@
+#pragma once
+
+#include <atomic>
+#include <chrono>
+#include <cstddef>
+#include <cstdint>
+#include <deque>
+#include <map>
+#include <mutex>
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "broker/Value.h"
+
+// Enumerations that clients pull in pieces (DSP0200 5.3.2.24). The objects are collected when the enumeration is opened
+// and are kept as the text that goes into responses; so a client sees one state of the system, and a slow client holds
+// no provider. What is kept is bounded, in number and in bytes; what no client comes back for goes after its timeout.
+//
+// Any number of threads may use one PullTable at once.
+
+namespace zorva::server {
+
+/// The status codes of pulled enumerations that CMPI has no name for (DSP0200 5.2.4).
+enum PullStatus : int {
+  kInvalidEnumerationContext = 21,
+  kInvalidOperationTimeout = 22,
+  kFilteredEnumerationNotSupported = 25,
+  kContinuationOnErrorNotSupported = 26,
+  kServerLimitsExceeded = 27,
+};
+
+struct PullLimits {
+  std::chrono::seconds defaultTimeout{60};
+  std::chrono::seconds maxTimeout{600};
+  std::size_t maxOpen = 100;
+  std::size_t maxObjects = 10'000;    ///< that one pull may ask for
+  std::size_t maxBytes = 64U << 20U;  ///< of text, in all enumerations together
+};
+
+/// What an enumeration gives.
+enum class PullForm { Instances, Paths };
+
+class PullTable;
+
+/// Objects of one enumeration, in order, and their share of the table's bytes, which is given back with them.
+class PullObjects {
+ public:
+  explicit PullObjects(PullTable& table) : table_(table) {}
+  ~PullObjects();
+  PullObjects(const PullObjects&) = delete;
+  PullObjects& operator=(const PullObjects&) = delete;
+
+  /// False, with nothing added, where the table has no room left.
+  bool add(std::string_view text);
+  std::size_t size() const noexcept { return texts_.size(); }
+  const std::deque<std::string>& texts() const noexcept { return texts_; }
+  /// Moves the first `count` of them, or all that there are, to `taken`.
+  void moveTo(PullObjects& taken, std::size_t count);
+
+ private:
+  PullTable& table_;
+  std::deque<std::string> texts_;
+  std::size_t bytes_ = 0;
+};
+
+class PullTable {
+ public:
+  using Clock = std::chrono::steady_clock;
+
+  explicit PullTable(PullLimits limits) : limits_(limits) {}
+  PullTable(const PullTable&) = delete;
+  PullTable& operator=(const PullTable&) = delete;
+
+  const PullLimits& limits() const noexcept { return limits_; }
+
+  /// Whether a further enumeration may be opened: CIM_ERR_SERVER_LIMITS_EXCEEDED where too many are open.
+  broker::Status room(Clock::time_point now = Clock::now());
+
+  /// Keeps what is left of an enumeration. `context` gets the name under which it is found again. The status is as
+  /// room()'s; then nothing is kept.
+  broker::Status keep(PullForm form, std::string_view nameSpace, PullObjects& rest, std::chrono::seconds timeout,
+                      std::string& context, Clock::time_point now = Clock::now());
+
+  /// Moves up to `count` objects to `taken`. `ended`: none are left, and the context with them. The timeout begins
+  /// anew. CIM_ERR_INVALID_ENUMERATION_CONTEXT where there is no such context, in this namespace and of this form.
+  broker::Status take(const std::string& context, std::string_view nameSpace, PullForm form, std::size_t count,
+                      PullObjects& taken, bool& ended, Clock::time_point now = Clock::now());
+
+  broker::Status close(const std::string& context, std::string_view nameSpace, Clock::time_point now = Clock::now());
+
+  /// How many objects are left.
+  broker::Status count(const std::string& context, std::string_view nameSpace, std::uint64_t& left,
+                       Clock::time_point now = Clock::now());
+
+  /// Drops what nobody has come back for in time. The functions above do so too.
+  void reclaim(Clock::time_point now = Clock::now());
+
+  std::size_t openCount() const;
+  std::size_t bytes() const noexcept { return bytes_.load(); }
+
+ private:
+  friend class PullObjects;
+
+  struct Open {
+    explicit Open(PullTable& table) : objects(table) {}
+    PullForm form = PullForm::Instances;
+    std::string nameSpace;
+    PullObjects objects;
+    std::chrono::seconds timeout{};
+    Clock::time_point deadline;
+  };
+  using Map = std::map<std::string, Open, std::less<>>;
+
+  void dropOld(Clock::time_point now);
+  broker::Status find(const std::string& context, std::string_view nameSpace, Map::iterator& found);
+
+  const PullLimits limits_;
+  std::atomic<std::size_t> bytes_ = 0;
+  mutable std::mutex mutex_;
+  Map open_;  // guarded by mutex_
+};
+
+}  // namespace zorva::server

@@ -1,0 +1,241 @@
+#include "server/Pull.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <thread>
+#include <vector>
+
+#include "server/ServiceHarness.h"
+
+namespace zorva::server {
+namespace {
+
+using std::chrono::seconds;
+using testing::className;
+using ::testing::ElementsAre;
+using ::testing::HasSubstr;
+using ::testing::Not;
+using ::testing::StartsWith;
+using testing::text;
+
+class PullTableTest : public ::testing::Test {
+ protected:
+  PullTableTest() : table_({seconds(60), seconds(600), 2, 100, 1000}) {}
+
+  std::string open(const std::vector<std::string>& objects, PullForm form = PullForm::Paths) {
+    PullObjects rest(table_);
+    for (const std::string& object : objects) EXPECT_TRUE(rest.add(object));
+    std::string context;
+    const broker::Status status = table_.keep(form, "root/cimv2", rest, seconds(10), context, now_);
+    EXPECT_TRUE(status.ok()) << status.message;
+    return context;
+  }
+
+  std::vector<std::string> take(const std::string& context, std::size_t count) {
+    PullObjects taken(table_);
+    status_ = table_.take(context, "ROOT/cimv2", PullForm::Paths, count, taken, ended_, now_);
+    return {taken.texts().begin(), taken.texts().end()};
+  }
+
+  PullTable table_;
+  PullTable::Clock::time_point now_ = PullTable::Clock::now();
+  broker::Status status_;
+  bool ended_ = false;
+};
+
+TEST_F(PullTableTest, GivesObjectsInOrderUntilNoneAreLeft) {
+  const std::string context = open({"a", "b", "c"});
+  EXPECT_THAT(take(context, 2), ElementsAre("a", "b"));
+  EXPECT_FALSE(ended_);
+  EXPECT_THAT(take(context, 2), ElementsAre("c"));
+  EXPECT_TRUE(ended_);
+  take(context, 1);
+  EXPECT_EQ(status_.rc, kInvalidEnumerationContext);
+}
+
+TEST_F(PullTableTest, KeepsWhatIsAskedForInTime) {
+  const std::string context = open({"a", "b"});
+  for (int i = 0; i < 5; ++i) {
+    now_ += seconds(9);
+    take(context, 0);
+    EXPECT_TRUE(status_.ok());
+  }
+  now_ += seconds(10);
+  take(context, 1);
+  EXPECT_EQ(status_.rc, kInvalidEnumerationContext);
+  EXPECT_THAT(status_.message, HasSubstr("left alone for longer"));
+  EXPECT_EQ(table_.bytes(), 0U);
+}
+
+TEST_F(PullTableTest, DropsWhatNobodyComesBackFor) {
+  open({"a"});
+  open({"b"});
+  EXPECT_EQ(table_.openCount(), 2U);
+  now_ += seconds(11);
+  table_.reclaim(now_);
+  EXPECT_EQ(table_.openCount(), 0U);
+  EXPECT_EQ(table_.bytes(), 0U);
+}
+
+TEST_F(PullTableTest, BoundsHowManyAreOpen) {
+  open({"a"});
+  open({"b"});
+  EXPECT_EQ(table_.room(now_).rc, kServerLimitsExceeded);
+  now_ += seconds(11);
+  EXPECT_TRUE(table_.room(now_).ok());
+}
+
+TEST_F(PullTableTest, BoundsTheirMemory) {
+  PullObjects many(table_);
+  int added = 0;
+  while (many.add(std::string(36, 'x'))) ++added;
+  EXPECT_EQ(added, 10);
+  EXPECT_EQ(table_.bytes(), 1000U);
+  PullObjects taken(table_);
+  many.moveTo(taken, 4);
+  EXPECT_EQ(table_.bytes(), 1000U);
+}
+
+TEST_F(PullTableTest, TellsContextsOfOtherNamespacesAndFormsApart) {
+  const std::string context = open({"a"}, PullForm::Instances);
+  take(context, 1);
+  EXPECT_EQ(status_.rc, kInvalidEnumerationContext);
+  EXPECT_THAT(status_.message, HasSubstr("use PullInstancesWithPath"));
+  EXPECT_EQ(table_.close(context, "interop", now_).rc, kInvalidEnumerationContext);
+  EXPECT_TRUE(table_.close(context, "root/cimv2", now_).ok());
+  EXPECT_EQ(table_.openCount(), 0U);
+}
+
+TEST_F(PullTableTest, NamesContextsSoThatNobodyCanGuessThem) {
+  const std::string one = open({"a"});
+  const std::string other = open({"a"});
+  EXPECT_EQ(one.size(), 32U);
+  EXPECT_NE(one, other);
+}
+
+TEST(PullThreads, ManyMayPullAtOnce) {
+  PullTable table({seconds(60), seconds(600), 100, 100, 1'000'000});
+  PullObjects rest(table);
+  for (int i = 0; i < 1000; ++i) ASSERT_TRUE(rest.add("x"));
+  std::string context;
+  ASSERT_TRUE(table.keep(PullForm::Paths, "n", rest, seconds(60), context).ok());
+  std::atomic<std::size_t> got = 0;
+  std::vector<std::thread> threads;
+  for (int i = 0; i < 4; ++i) {
+    threads.emplace_back([&] {
+      bool ended = false;
+      while (!ended) {
+        PullObjects taken(table);
+        if (!table.take(context, "n", PullForm::Paths, 7, taken, ended).ok()) break;
+        got += taken.size();
+      }
+    });
+  }
+  for (std::thread& thread : threads) thread.join();
+  EXPECT_EQ(got, 1000U);
+  EXPECT_EQ(table.openCount(), 0U);
+}
+
+// The operations.
+
+std::string contextOf(const std::string& response) {
+  const std::string begin = "NAME=\"EnumerationContext\" PARAMTYPE=\"string\"><VALUE>";
+  const std::size_t at = response.find(begin);
+  return at == std::string::npos ? "" : response.substr(at + begin.size(), 32);
+}
+
+constexpr const char* kMore =
+    "<PARAMVALUE NAME=\"EndOfSequence\" PARAMTYPE=\"boolean\"><VALUE>FALSE</VALUE></PARAMVALUE>";
+constexpr const char* kEnd =
+    "<PARAMVALUE NAME=\"EndOfSequence\" PARAMTYPE=\"boolean\"><VALUE>TRUE</VALUE></PARAMVALUE>";
+
+std::string pull(const std::string& context, int count) {
+  return text("EnumerationContext", context) + text("MaxObjectCount", std::to_string(count));
+}
+
+TEST(PulledOperations, GiveInstancesPieceByPiece) {
+  testing::TestService service;
+  const std::string opened = service.ask("OpenEnumerateInstances", className("ClassName", "T_Thing"));
+  EXPECT_THAT(opened, HasSubstr("<IRETURNVALUE></IRETURNVALUE>"));
+  EXPECT_THAT(opened, HasSubstr(kMore));
+  const std::string context = contextOf(opened);
+  EXPECT_THAT(service.ask("EnumerationCount", text("EnumerationContext", context)),
+              HasSubstr("<IRETURNVALUE><VALUE>3</VALUE></IRETURNVALUE>"));
+  const std::string first = service.ask("PullInstancesWithPath", pull(context, 2));
+  EXPECT_THAT(first, HasSubstr("<VALUE.INSTANCEWITHPATH><INSTANCEPATH><NAMESPACEPATH><HOST>this</HOST>"));
+  EXPECT_THAT(first, HasSubstr(kMore));
+  EXPECT_EQ(contextOf(first), context);
+  const std::string second = service.ask("PullInstancesWithPath", pull(context, 2));
+  EXPECT_THAT(second, HasSubstr("T_SpecialThing"));
+  EXPECT_THAT(second, HasSubstr(kEnd));
+  EXPECT_THAT(service.ask("PullInstancesWithPath", pull(context, 2)), HasSubstr("<ERROR CODE=\"21\""));
+}
+
+TEST(PulledOperations, EndAtOnceWhereAllIsTaken) {
+  testing::TestService service;
+  const std::string response =
+      service.ask("OpenEnumerateInstancePaths", className("ClassName", "T_Thing") + text("MaxObjectCount", "3"));
+  EXPECT_THAT(response, HasSubstr(kEnd));
+  EXPECT_EQ(contextOf(response), "");
+}
+
+TEST(PulledOperations, CoverAssociationsToo) {
+  testing::TestService service;
+  const std::string a = testing::parameter("InstanceName", testing::instanceName("T_Thing", {{"Name", "a"}})) +
+                        text("MaxObjectCount", "9");
+  EXPECT_THAT(service.ask("OpenAssociatorInstances", a + className("ResultClass", "T_Other")),
+              HasSubstr("<INSTANCE CLASSNAME=\"T_Other\">"));
+  EXPECT_THAT(service.ask("OpenAssociatorInstancePaths", a), HasSubstr("<IRETURNVALUE><INSTANCEPATH>"));
+  EXPECT_THAT(service.ask("OpenReferenceInstances", a + text("Role", "Left")),
+              HasSubstr("<INSTANCE CLASSNAME=\"T_ThingOther\">"));
+  EXPECT_THAT(service.ask("OpenReferenceInstancePaths", a + className("ResultClass", "T_ThingOther")),
+              HasSubstr("<INSTANCENAME CLASSNAME=\"T_ThingOther\">"));
+}
+
+TEST(PulledOperations, PullPaths) {
+  testing::TestService service;
+  const std::string context = contextOf(
+      service.ask("OpenEnumerateInstancePaths", className("ClassName", "T_Thing") + text("OperationTimeout", "5")));
+  EXPECT_THAT(service.ask("PullInstancesWithPath", pull(context, 1)), HasSubstr("use PullInstancePaths"));
+  EXPECT_THAT(service.ask("PullInstancePaths", pull(context, 1)), HasSubstr("<IRETURNVALUE><INSTANCEPATH>"));
+}
+
+TEST(PulledOperations, CanBeClosed) {
+  testing::TestService service;
+  const std::string context = contextOf(service.ask("OpenEnumerateInstances", className("ClassName", "T_Thing")));
+  const std::string which = text("EnumerationContext", context);
+  EXPECT_THAT(service.ask("CloseEnumeration", which), Not(HasSubstr("ERROR")));
+  EXPECT_THAT(service.ask("CloseEnumeration", which), HasSubstr("<ERROR CODE=\"21\""));
+  EXPECT_THAT(service.ask("EnumerationCount", which), HasSubstr("<ERROR CODE=\"21\""));
+}
+
+TEST(PulledOperations, RefuseWhatTheyDoNotOffer) {
+  testing::TestService service;
+  const auto open = [&](const std::string& parameters) {
+    return service.ask("OpenEnumerateInstances", className("ClassName", "T_Thing") + parameters);
+  };
+  EXPECT_THAT(open(text("OperationTimeout", "0")), HasSubstr("<ERROR CODE=\"22\""));
+  EXPECT_THAT(open(text("OperationTimeout", "601")), HasSubstr("must be from 1 to 600 seconds"));
+  EXPECT_THAT(open(text("FilterQueryLanguage", "DMTF:FQL") + text("FilterQuery", "a = 1")),
+              HasSubstr("<ERROR CODE=\"25\""));
+  EXPECT_THAT(open(text("ContinueOnError", "true")), HasSubstr("<ERROR CODE=\"26\""));
+  EXPECT_THAT(open(text("ContinueOnError", "false") + text("FilterQuery", "")), HasSubstr(kMore));
+  EXPECT_THAT(open(text("MaxObjectCount", "10001")), HasSubstr("<ERROR CODE=\"4\""));
+  EXPECT_THAT(open(text("MaxObjectCount", "-1")), HasSubstr("must be a uint32"));
+}
+
+TEST(PulledOperations, StayWithinTheLimitsOfTheServer) {
+  ServiceOptions options;
+  options.maxPulls = 1;
+  testing::TestService few(options);
+  const std::string thing = className("ClassName", "T_Thing");
+  EXPECT_THAT(few.ask("OpenEnumerateInstances", thing), HasSubstr(kMore));
+  EXPECT_THAT(few.ask("OpenEnumerateInstances", thing), HasSubstr("<ERROR CODE=\"27\""));
+  options.maxPullBytes = 1500;
+  testing::TestService small(options);
+  EXPECT_THAT(small.ask("OpenEnumerateInstances", thing), HasSubstr("hold more than 1500 bytes"));
+}
+
+}  // namespace
+}  // namespace zorva::server

@@ -1,0 +1,176 @@
+#include "server/Service.h"
+
+#include <exception>
+
+#include "broker/PathText.h"
+#include "cimxml/RequestReader.h"
+#include "cimxml/ResponseWriter.h"
+#include "cmpidt.h"
+#include "server/Operations.h"
+#include "server/Pull.h"
+#include "server/ServiceHeaders.h"
+#include "server/ServiceHost.h"
+
+namespace zorva::server {
+
+namespace {
+
+using broker::LogLevel;
+using broker::Status;
+
+// A buffer that a response of large objects has made larger than this is not kept for the next request.
+constexpr std::size_t kMostKept = 256U << 10U;
+
+HttpRefusal refusalOf(const cimxml::RequestError& error) {
+  switch (error.fault) {
+    case cimxml::Fault::NotWellFormed:
+      return {400, "request-not-well-formed", error.message};
+    case cimxml::Fault::NotLooselyValid:
+      return {400, "request-not-loosely-valid", error.message};
+    case cimxml::Fault::UnsupportedCimVersion:
+      return {501, "unsupported-cim-version", error.message};
+    case cimxml::Fault::UnsupportedDtdVersion:
+      return {501, "unsupported-dtd-version", error.message};
+    case cimxml::Fault::UnsupportedProtocolVersion:
+      return {501, "unsupported-protocol-version", error.message};
+    case cimxml::Fault::UnsupportedOperation:
+      break;
+  }
+  return {501, "unsupported-operation", error.message};
+}
+
+PullLimits pullLimits(const ServiceOptions& options) {
+  PullLimits limits;
+  limits.defaultTimeout = options.pullDefaultTimeout;
+  limits.maxTimeout = options.pullMaxTimeout;
+  limits.maxOpen = options.maxPulls;
+  limits.maxObjects = options.maxPullObjects;
+  limits.maxBytes = options.maxPullBytes;
+  return limits;
+}
+
+/// The memory that this thread's responses gather in, used again and again.
+class Buffer {
+ public:
+  Buffer() = default;
+  ~Buffer() {
+    if (kept().capacity() > kMostKept) std::string().swap(kept());
+  }
+  Buffer(const Buffer&) = delete;
+  Buffer& operator=(const Buffer&) = delete;
+
+  std::string& text() noexcept { return kept(); }
+
+ private:
+  static std::string& kept() noexcept {
+    thread_local std::string buffer;
+    return buffer;
+  }
+};
+
+}  // namespace
+
+class ServiceCore {
+ public:
+  ServiceCore(broker::Broker& broker, ServiceOptions options)
+      : broker_(broker), options_(std::move(options)), host_(options_.hostName), pulls_(pullLimits(options_)) {}
+
+  void handle(const HttpRequest& http, ResponseSink& sink, broker::Caller caller) {
+    CimHeaders headers;
+    cimxml::CimRequest request;
+    std::optional<HttpRefusal> refusal = readHeaders(http, headers);
+    if (!refusal) {
+      cimxml::ReaderLimits limits;
+      limits.xml.depth = options_.maxDepth;
+      limits.calls = options_.maxOperations;
+      if (const auto error = cimxml::readRequest(http.body, limits, request)) refusal = refusalOf(*error);
+    }
+    if (!refusal) refusal = checkHeaders(headers, request, broker_);
+    if (refusal) return refuse(*refusal, sink);
+    caller.acceptLanguage = headers.acceptLanguage;
+    caller.contentLanguage = headers.contentLanguage;
+    answer(request, headers, caller, sink);
+  }
+
+  void reclaim() { pulls_.reclaim(); }
+
+  void log(LogLevel level, const std::string& text) const noexcept {
+    if (!options_.log) return;
+    try {
+      options_.log(level, text);
+    } catch (...) {
+      // A log that fails must not fail the request.
+    }
+  }
+
+ private:
+  void refuse(const HttpRefusal& refusal, ResponseSink& sink) const {
+    log(LogLevel::Warning, "a request was refused with HTTP status " + std::to_string(refusal.status) +
+                               (refusal.cimError.empty() ? "" : ", " + refusal.cimError) + ": " + refusal.message);
+    HeaderList fields{{"Content-Type", "text/plain; charset=\"utf-8\""}};
+    if (!refusal.cimError.empty()) fields.emplace_back("CIMError", refusal.cimError);
+    sink.begin(refusal.status, fields);
+    sink.write(refusal.message + "\n");
+  }
+
+  void answer(const cimxml::CimRequest& request, const CimHeaders& headers, const broker::Caller& caller,
+              ResponseSink& sink) {
+    Buffer buffer;
+    cimxml::ResponseWriter writer(buffer.text(), options_.unsentText, [&](std::string_view text) {
+      if (!sink.begun()) sink.begin(200, responseHeaders(headers));
+      sink.write(text);
+    });
+    writer.beginMessage(request.id, request.isMultiple);
+    for (const cimxml::Call& call : request.calls) {
+      writer.beginResponse(call.name, call.isExtrinsic);
+      Operation operation{broker_, pulls_, host_, caller, call, writer, headers.host, {}};
+      const Status status = carryOutSafely(operation);
+      if (!status.ok()) {
+        const std::string text(broker::statusName(status.rc));
+        log(LogLevel::Info, call.name + " in " + broker::quotedText(call.target.nameSpace.substr(0, 200)) + ": " +
+                                (text.empty() ? std::to_string(status.rc) : text) + ": " + status.message);
+        const auto code = static_cast<std::uint32_t>(status.rc);
+        if (!writer.putError(code, status.message)) return sink.fail(code, status.message);
+      }
+      writer.endResponse();
+    }
+    writer.endMessage();
+  }
+
+  Status carryOutSafely(Operation& operation) const {
+    try {
+      return carryOut(operation);
+    } catch (const ClientGone&) {
+      throw;
+    } catch (const std::exception& problem) {
+      return {CMPI_RC_ERR_FAILED, std::string("the server cannot answer: ") + problem.what()};
+    }
+  }
+
+  broker::Broker& broker_;
+  const ServiceOptions options_;
+  const ServiceHost host_;
+  PullTable pulls_;
+};
+
+Service::Service(broker::Broker& broker, ServiceOptions options)
+    : core_(std::make_unique<ServiceCore>(broker, std::move(options))) {}
+
+Service::~Service() = default;
+
+void Service::handle(const HttpRequest& request, ResponseSink& sink, const broker::Caller& caller) {
+  try {
+    core_->handle(request, sink, caller);
+  } catch (const ClientGone&) {
+    throw;
+  } catch (const std::exception& problem) {
+    core_->log(LogLevel::Error, std::string("a request failed: ") + problem.what());
+    if (sink.begun()) return sink.fail(CMPI_RC_ERR_FAILED, problem.what());
+    sink.begin(500, {{"Content-Type", "text/plain; charset=\"utf-8\""}});
+    sink.write("the server cannot answer\n");
+  }
+}
+
+void Service::reclaim() { core_->reclaim(); }
+
+}  // namespace zorva::server

@@ -1,0 +1,57 @@
+#include "server/Systemd.h"
+
+#include <sys/socket.h>
+#include <sys/un.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <charconv>
+#include <cstddef>
+#include <cstdlib>
+#include <cstring>
+#include <string>
+
+#include "server/Listener.h"
+
+namespace zorva::server {
+
+namespace {
+
+constexpr int kMostSockets = 64;
+
+/// The value as a number; -1 where it is none.
+long number(const char* text) {
+  if (text == nullptr) return -1;
+  long value = -1;
+  const char* const end = text + std::strlen(text);
+  const auto [rest, error] = std::from_chars(text, end, value);
+  return error == std::errc() && rest == end ? value : -1;
+}
+
+}  // namespace
+
+void notifyServiceManager(std::string_view state) {
+  const char* path = std::getenv("NOTIFY_SOCKET");
+  if (path == nullptr || (*path != '/' && *path != '@')) return;
+  sockaddr_un address{};
+  address.sun_family = AF_UNIX;
+  const std::size_t size = std::strlen(path);
+  if (size >= sizeof address.sun_path) return;
+  std::memcpy(address.sun_path, path, size);
+  if (*path == '@') address.sun_path[0] = '\0';  // a name that is in no directory
+
+  const Descriptor socket(::socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0));
+  if (!socket) return;
+  const auto addressSize = static_cast<socklen_t>(offsetof(sockaddr_un, sun_path) + size);
+  ::sendto(socket.get(), state.data(), state.size(), MSG_NOSIGNAL, reinterpret_cast<const sockaddr*>(&address),
+           addressSize);
+}
+
+int countOfInheritedSockets() {
+  const bool forUs = number(std::getenv("LISTEN_PID")) == static_cast<long>(::getpid());
+  const long count = forUs ? number(std::getenv("LISTEN_FDS")) : 0;
+  for (const char* name : {"LISTEN_PID", "LISTEN_FDS", "LISTEN_FDNAMES"}) ::unsetenv(name);
+  return static_cast<int>(std::clamp(count, 0L, static_cast<long>(kMostSockets)));
+}
+
+}  // namespace zorva::server

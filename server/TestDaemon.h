@@ -1,0 +1,60 @@
+#pragma once
+
+#include <sys/types.h>
+
+#include <chrono>
+#include <functional>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "agent/testing/TemporaryDirectory.h"
+#include "server/Listener.h"
+
+// For tests: zorvacimd itself, on a host that is a tree in a file.
+
+namespace zorva::server::testing {
+
+/// How a run that ends by itself ended.
+struct DaemonOutcome {
+  int exitCode = -1;  ///< 128 and the number where a signal ended it
+  std::string out;
+  std::string err;
+};
+
+class TestDaemon {
+ public:
+  /// `config` is the text of zorvacimd.toml; the log goes to a file. Port 0 of 127.0.0.1, unless `arguments` say
+  /// otherwise. `prepare` runs in the child before the program. Waits until it tells its address.
+  explicit TestDaemon(const std::string& config = {}, std::vector<std::string> arguments = {},
+                      const std::function<void()>& prepare = {});
+  ~TestDaemon();
+  TestDaemon(const TestDaemon&) = delete;
+  TestDaemon& operator=(const TestDaemon&) = delete;
+
+  int port() const { return port_; }
+  pid_t process() const { return process_; }
+  const zorvagent::testing::TemporaryDirectory& directory() const { return directory_; }
+
+  void signal(int number) const;
+
+  /// Waits for it to end; -1 where it does not within that time.
+  int exitCodeWithin(std::chrono::milliseconds most);
+
+  std::string log() const;
+  /// Waits until the log holds that text.
+  bool logs(const std::string& text) const;
+
+  void writeConfig(const std::string& config) const;
+
+  /// Runs it with these arguments until it ends by itself.
+  static DaemonOutcome run(const std::vector<std::string>& arguments);
+
+ private:
+  zorvagent::testing::TemporaryDirectory directory_;
+  pid_t process_ = -1;
+  Descriptor out_;
+  int port_ = 0;
+};
+
+}  // namespace zorva::server::testing

@@ -1,0 +1,3 @@
+#include "server/Daemon.h"
+
+int main(int argc, char** argv) { return zorva::server::runServer(argc, argv, zorva::server::makeBuiltInBroker); }

@@ -1,0 +1,32 @@
+// Makes the host and the broker that a case describes.
+#pragma once
+
+#include <cstddef>
+#include <string>
+#include <vector>
+
+#include "CaseFile.h"
+#include "RecordingBroker.h"
+#include "World.h"
+
+namespace ZV::Test {
+
+// The lines of a world, and installs it.
+void furnish(World& world, const std::vector<WrittenLine>& lines);
+
+// One call that shall fail: of the broker, or of a cursor in the tree.
+struct Failure {
+  WrittenLine line;
+  std::string call;  // the slot; empty for a call of the tree
+  zorvagent::TreeCall treeCall = zorvagent::TreeCall::Construct;
+  std::size_t n = 0;  // the n-th call of its kind in the request, or 0 for each
+  Mode mode = Mode::ReturnNull;
+  Thrown thrown = Thrown::StdException;
+
+  bool isOfTree() const { return call.empty(); }
+};
+
+// The lines of a broker: sets up what it serves and how it answers, and gives back what shall fail.
+std::vector<Failure> furnish(RecordingBroker& broker, const std::vector<WrittenLine>& lines);
+
+}  // namespace ZV::Test

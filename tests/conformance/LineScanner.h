@@ -1,0 +1,52 @@
+// Takes a line of a case apart: words, numbers, texts in quotes, values and object paths, in the notation in which the
+// recording broker shows them. What does not fit is a CaseError.
+#pragma once
+
+#include <cstddef>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+#include "CaseFile.h"
+#include "CimValues.h"
+
+namespace ZV::Test {
+
+class LineScanner {
+ public:
+  explicit LineScanner(WrittenLine line) : line_(std::move(line)) {}
+
+  bool atEnd();
+  void expectEnd();
+  // Takes the words if they come next, with a word's end behind them.
+  bool take(std::string_view words);
+  void expect(std::string_view words);
+
+  std::string word(const std::string& what);  // up to a blank, a comma or a colon
+  unsigned int number(const std::string& what);
+  std::string quoted(const std::string& what);        // "a\nb", with \n, \t, \" and \\ for what they are in C
+  std::string wordOrQuoted(const std::string& what);  // a name that has no blanks needs no quotes
+  std::vector<std::string> quotedList(const std::string& what);  // {"a", "b"}
+  Value value();  // string "a", uint16 3, string[] {"a", null}, boolean true, ref (PATH), null
+  Path path();    // //host/root/cimv2:CLASS.Key="a",Other=(PATH); without a namespace root/cimv2
+
+  [[noreturn]] void fail(const std::string& what) const;
+
+ private:
+  void skipBlanks();
+  char peek() const { return at_ < line_.text.size() ? line_.text[at_] : '\0'; }
+  bool takeCharacter(char c);
+  void expectCharacter(char c);
+  std::vector<Value> elements(CMPIType type);
+  Value element(CMPIType type);
+  Value keyValue();
+
+  WrittenLine line_;
+  std::size_t at_ = 0;
+};
+
+// Rewrites an error of the line to the place where it stands in the case.
+CaseError errorAt(const WrittenLine& line, const std::string& what);
+
+}  // namespace ZV::Test

@@ -1,0 +1,71 @@
+// What a case asks of a provider.
+#pragma once
+
+#include <cmpift.h>
+
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "CaseFile.h"
+#include "CimValues.h"
+#include "ProviderCall.h"
+#include "Providers.h"
+#include "RecordingBroker.h"
+
+namespace ZV::Test {
+
+enum class Operation {
+  EnumInstanceNames,
+  EnumInstances,
+  GetInstance,
+  CreateInstance,
+  ModifyInstance,
+  DeleteInstance,
+  ExecQuery,
+  Cleanup,
+  Associators,
+  AssociatorNames,
+  References,
+  ReferenceNames,
+  AssociationCleanup,
+  InvokeMethod,
+  MethodCleanup,
+};
+
+struct Request {
+  Operation operation = Operation::EnumInstances;
+  Path path;
+  PropertyList properties = nullptr;
+  std::optional<std::string> assocClass;
+  std::optional<std::string> resultClass;
+  std::optional<std::string> role;
+  std::optional<std::string> resultRole;
+  std::string method;
+  std::vector<NamedValue> values;  // of the instance or of the method's arguments
+  bool withoutInstance = false;
+  bool withoutHandle = false;  // of the instance
+};
+
+// The request in a case's lines; an association that is left out is the provider's own. Throws CaseError.
+Request readRequest(const std::vector<WrittenLine>& lines, const std::string& ownAssociation);
+
+// The objects that a provider is called with; made before the call is recorded.
+struct RequestObjects {
+  RequestObjects(RecordingBroker& broker, const Request& request);
+
+  const CMPIContext* context;
+  CMPIResult* result;
+  CMPIObjectPath* ref;
+  CMPIInstance* instance;  // null where the request has none
+  CMPIArgs* in;
+  CMPIArgs* out;
+};
+
+// Makes the provider and asks it. Exceptions pass.
+CMPIStatus ask(const ProviderFunctions& provider, RecordingBroker& broker, Request& request,
+               const RequestObjects& objects);
+// Whether the provider has the table that the operation stands in.
+bool canAsk(const ProviderFunctions& provider, Operation operation);
+
+}  // namespace ZV::Test

@@ -1,0 +1,90 @@
+// The broker fails at each call that a request makes, in each way in which a broker can fail.
+#include "FaultTest.h"
+
+namespace ZV::Test {
+namespace {
+
+class BrokerFaults : public FaultTest {
+ protected:
+  // Whether a call tells how it went by its status alone. It can fail by a code, and in no other way but to throw.
+  static bool onlyGivesStatus(const std::string& call) {
+    return call.starts_with("set") || call.starts_with("return") || call == "addKey";
+  }
+
+  static bool hasMode(const std::string& call, Mode mode) {
+    return mode == Mode::SetRc || mode == Mode::Throw || !onlyGivesStatus(call);
+  }
+
+  std::size_t failEach(const Request& request, Mode mode, const Check& check) {
+    SCOPED_TRACE(request.name + ", " + nameOf(mode));
+    return failEachCall(
+        request,
+        [&](std::size_t n, const std::function<void()>& run) {
+          broker_.startOver();
+          broker_.failAt(n, mode);
+          run();
+          return broker_.hasFailed();
+        },
+        check, [mode](const RecordedCall& call) { return hasMode(call.name, mode); });
+  }
+
+  // The code that a client gets is that of a call to the broker: the one that failed, or one that asked for a name that
+  // is not there, be it that it could not be set. Of the modifications, that of the endpoint and of an interface's
+  // settings may have one of its own.
+  static void expectCodeOfTheBroker(const Request& request, std::size_t n, Mode mode, const Ending& ending,
+                                    const Usual& usual) {
+    const CMPIrc rc = ending.outcome.rc;
+    if (rc == CMPI_RC_OK || rc == usual.ending.outcome.rc) return;
+    const std::string& failed = ending.outcome.calls.at(n - 1).name;
+    if (rc == CMPI_RC_ERR_NOT_FOUND || rc == CMPI_RC_ERR_NO_SUCH_PROPERTY) {
+      EXPECT_TRUE(request.name == "GetInstance of a name without keys" || failed == "setProperty" || failed == "addKey")
+          << ending.outcome;
+    } else if (request.kind == Kind::Modify) {
+      EXPECT_TRUE(rc == CMPI_RC_ERR_FAILED || rc == CMPI_RC_ERR_INVALID_PARAMETER) << ending.outcome;
+    } else {
+      EXPECT_EQ(CMPI_RC_ERR_FAILED, rc) << ending.outcome;
+      EXPECT_TRUE(mode == Mode::SetRc || mode == Mode::RcAndNull) << "a code that nobody gave: " << ending.outcome;
+    }
+  }
+
+  // An exception that every run of the request has.
+  static bool fliesAnyway(const Ending& ending, const Usual& usual) {
+    return !usual.ending.returned() && ending.what == usual.ending.what;
+  }
+};
+
+TEST_P(BrokerFaults, EndAsTheBrokerHasItAndLeaveNothingBehind) {
+  std::size_t tried = 0;
+  for (const Request& request : requests()) {
+    for (const Mode mode : kAllStatusModes) {
+      tried += failEach(request, mode, [&](std::size_t n, const Ending& ending, const Usual& usual) {
+        EXPECT_TRUE(ending.returned() || fliesAnyway(ending, usual)) << "flown: " << ending.what;
+        expectCodeOfTheBroker(request, n, mode, ending, usual);
+        expectKnownFiles(request, usual);
+      });
+    }
+  }
+  report("broker", tried);
+}
+
+// Only the endpoint's modification holds an exception back, and answers with a failure.
+TEST_P(BrokerFaults, ExceptionsOfTheBrokerPassOn) {
+  std::size_t tried = 0;
+  for (const Request& request : requests()) {
+    tried += failEach(request, Mode::Throw, [&](std::size_t, const Ending& ending, const Usual& usual) {
+      if (ending.returned()) {
+        EXPECT_EQ(Kind::Modify, request.kind);
+        EXPECT_STREQ("ZORVA_DNSProtocolEndPoint", provider().className);
+        EXPECT_EQ(CMPI_RC_ERR_FAILED, ending.outcome.rc);
+        EXPECT_THAT(ending.outcome.errors(), ::testing::Contains("Caught Exception : "));
+      }
+      expectKnownFiles(request, usual);
+    });
+  }
+  report("broker exception", tried);
+}
+
+ZV_ON_ALL_HOSTS(BrokerFaults);
+
+}  // namespace
+}  // namespace ZV::Test

@@ -1,0 +1,112 @@
+// Each call fails with which the agent reads a host: from the live one, or from a document. What could not be read for
+// a reason that passes is there at the next look.
+#include <gmock/gmock.h>
+
+#include <algorithm>
+#include <fstream>
+#include <functional>
+#include <iostream>
+
+#include "FaultTest.h"
+#include "FileCalls.h"
+#include "agent/Agent.h"
+#include "agent/Seams.h"
+#include "agent/sources/FileSource.h"
+#include "agent/sources/HostSource.h"
+#include "agent/testing/TemporaryDirectory.h"
+
+namespace ZV::Test {
+namespace {
+
+using zorvagent::testing::TemporaryDirectory;
+
+class SourceFaults : public ::testing::Test {
+ protected:
+  SourceFaults() {
+    zorvagent::reset();
+    directory_.write("etc/resolv.conf", "nameserver 127.0.0.53\nsearch example.org\n");
+    directory_.write("run/systemd/resolve/resolv.conf", "nameserver 192.0.2.53\n");
+    directory_.write("etc/hosts", "127.0.0.1 localhost\n");
+    directory_.write("sys/class/dmi/id/product_name", "Product\n");
+  }
+  ~SourceFaults() override { zorvagent::reset(); }
+
+  // Reads the tree from a new source with each call failing in turn, and then again without failures.
+  void failEachCall(const std::function<std::shared_ptr<zorvagent::TreeSource>()>& makeSource) {
+    const auto read = [&] { return zorvagent::treeToJson(*zorvagent::currentTree()); };
+    const auto start = [&] {
+      zorvagent::reset();
+      zorvagent::Config config;
+      config.dataDir = directory_.path();
+      config.logTarget = "off";
+      zorvagent::setConfig(config);
+      zorvagent::setTreeSource(makeSource());
+    };
+    start();
+    const std::string usual = read();
+    std::size_t tried = 0;
+    for (const FileFault fault : {FileFault::Refused, FileFault::HalfDone}) {
+      for (std::size_t n = 1;; ++n, ++tried) {
+        start();
+        FileCall failed{};
+        {
+          const FailingFiles failing(n, fault);
+          try {
+            read();
+          } catch (const std::runtime_error&) {  // a document that cannot be read is no tree
+          }
+          if (!failing.wasReached()) break;
+          failed = failing.failed();
+        }
+        EXPECT_EQ(usual, read()) << "after call " << n << ", " << nameOf(failed) << ", " << nameOf(fault);
+      }
+    }
+    countFaults("source", tried);
+    std::cout << tried << " faults\n";
+    EXPECT_GE(tried, 10U);
+  }
+
+  const TemporaryDirectory directory_;
+};
+
+TEST_F(SourceFaults, TheHostIsReadAgain) {
+  for (const int comparisons : {zorvagent::FileWatch::kComparisons, 0}) {
+    SCOPED_TRACE(comparisons);
+    failEachCall([&] {
+      return std::make_shared<zorvagent::HostSource>(
+          zorvagent::HostSourceOptions{.includeLoopback = true, .root = directory_ / "", .comparisons = comparisons});
+    });
+  }
+}
+
+TEST_F(SourceFaults, ADocumentIsReadAgain) {
+  const std::string path = directory_.write("tree.json", R"({ "system_name": "host1", "nodes": [] })");
+  failEachCall([&] { return std::make_shared<zorvagent::FileSource>(path); });
+}
+
+TEST_F(SourceFaults, ALogThatCannotBeWrittenStopsNothing) {
+  zorvagent::Config config;
+  config.dataDir = directory_.path();
+  config.logTarget = directory_ / "agent.log";
+  config.logLevel = 0;
+  std::size_t tried = 0;
+  for (const FileFault fault : kAllFileFaults) {
+    for (std::size_t n = 1;; ++n, ++tried) {
+      zorvagent::reset();
+      zorvagent::setConfig(config);
+      zorvagent::setTreeSource(std::make_shared<zorvagent::FixedSource>(World().host().nic("eth0").tree()));
+      const FailingFiles failing(n, fault);
+      RecordingBroker broker;
+      const Outcome outcome = requestsOf(allProviders().front()).front().run(broker);
+      EXPECT_EQ(CMPI_RC_OK, outcome.rc);
+      EXPECT_EQ(1U, outcome.paths().size());
+      if (!failing.wasReached()) break;
+    }
+  }
+  countFaults("log", tried);
+  std::cout << tried << " faults\n";
+  EXPECT_GE(tried, 30U);
+}
+
+}  // namespace
+}  // namespace ZV::Test

@@ -1,0 +1,60 @@
+// The provider library as a server loads it, and a host that the agent of a loaded library reads.
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "ProviderCall.h"
+#include "agent/testing/TemporaryDirectory.h"
+
+namespace ZV::Test {
+
+// A shared library from its loading to its unloading. mode is RTLD_LOCAL or RTLD_GLOBAL.
+class Library {
+ public:
+  explicit Library(const std::string& path, int mode);
+  ~Library();
+  Library(const Library&) = delete;
+  Library& operator=(const Library&) = delete;
+
+  // The library's own function of that name; throws std::runtime_error where it has none.
+  template <typename Function>
+  Function find(const std::string& name) const {
+    return reinterpret_cast<Function>(address(name));
+  }
+
+ private:
+  void* address(const std::string& name) const;
+
+  void* handle_;
+};
+
+std::string providerLibraryPath();
+
+// One of the twelve providers, by the names that a server knows.
+struct ProviderNames {
+  const char* prefix;
+  const char* className;
+  bool isAssociation;
+};
+const std::vector<ProviderNames>& allProviderNames();
+
+// A host of two interfaces in a document, which is what the agent reads as long as this lives.
+class DocumentHost {
+ public:
+  DocumentHost();
+  ~DocumentHost();
+  DocumentHost(const DocumentHost&) = delete;
+  DocumentHost& operator=(const DocumentHost&) = delete;
+
+ private:
+  zorvagent::testing::TemporaryDirectory directory_;
+};
+
+// What other providers serve of that host.
+void serveOthers(RecordingBroker& broker);
+
+// Asks each of the twelve for everything that it has, and says how each request ended and what came.
+std::string askEverything(const Library& library, RecordingBroker& broker);
+
+}  // namespace ZV::Test

@@ -1,0 +1,184 @@
+// The library in a process that is not its own: beside another that has all its names, loaded and unloaded again and
+// again, and used by two brokers.
+#include <dlfcn.h>
+#include <gmock/gmock.h>
+#include <malloc.h>
+
+#include <fstream>
+#include <iostream>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "Library.h"
+#include "broker/Broker.h"
+#include "schema/Schema.h"
+#include "tests/faults/LiveMemory.h"
+
+namespace ZV::Test {
+namespace {
+
+using ::testing::HasSubstr;
+
+std::string everythingAlone() {
+  RecordingBroker broker;
+  serveOthers(broker);
+  const Library library(providerLibraryPath(), RTLD_LOCAL);
+  return askEverything(library, broker);
+}
+
+// --- Names.
+
+// Everything in this library aborts.
+const std::string kSameNames = ZORVA_LIB_DIR "/libzorvasamenames.so";
+
+TEST(SameNames, AreNotMixedUpWhicheverLibraryCameFirst) {
+  const DocumentHost host;
+  const std::string alone = everythingAlone();
+  EXPECT_THAT(alone, HasSubstr("ZORVA_DNSProtocolEndPoint CMPI_RC_OK done"));
+  for (const bool isFirst : {true, false}) {
+    SCOPED_TRACE(isFirst);
+    RecordingBroker broker;
+    serveOthers(broker);
+    const auto before = isFirst ? std::make_unique<Library>(kSameNames, RTLD_GLOBAL) : nullptr;
+    const Library library(providerLibraryPath(), RTLD_GLOBAL);
+    const auto after = isFirst ? nullptr : std::make_unique<Library>(kSameNames, RTLD_GLOBAL);
+    EXPECT_EQ(alone, askEverything(library, broker));
+    const Library& other = isFirst ? *before : *after;
+    std::cout << *other.find<const int*>("zorvaSameNames") << " names\n";
+    EXPECT_NE(other.find<void*>("DNSClientProvider_Create_InstanceMI"),
+              library.find<void*>("DNSClientProvider_Create_InstanceMI"));
+  }
+}
+
+TEST(SameNames, LoadedGlobalTheLibraryGivesNothingAwayButItsCreateFunctions) {
+  // Not RTLD_DEFAULT: what is found by that is never unloaded.
+  const std::unique_ptr<void, int (*)(void*)> global(::dlopen(nullptr, RTLD_NOW), ::dlclose);
+  const Library library(providerLibraryPath(), RTLD_GLOBAL);
+  EXPECT_NE(nullptr, ::dlsym(global.get(), "DNSClientProvider_Create_InstanceMI"));
+  const Library same(kSameNames, RTLD_LOCAL);
+  for (const char* name : {"_ZN2ZV19DNSClientObjFactoryC1Ev", "_ZN2ZV20loggerDNSSettingDataB5cxx11E"}) {
+    EXPECT_NE(nullptr, same.find<void*>(name));
+    EXPECT_EQ(nullptr, ::dlsym(global.get(), name)) << name;
+  }
+}
+
+// --- Cycles.
+
+struct Held {
+  long blocks;  // of operator new, in all libraries
+  std::size_t heapBytes;
+  std::ptrdiff_t maps;  // of libraries
+  std::size_t files;
+};
+
+Held heldNow() {
+  std::ifstream maps("/proc/self/maps");
+  std::ptrdiff_t ofLibraries = 0;
+  for (std::string line; std::getline(maps, line);) ofLibraries += line.find(".so") != std::string::npos ? 1 : 0;
+  return {liveBlocks(), ::mallinfo2().uordblks, ofLibraries, openFiles()};
+}
+
+TEST(LoadCycles, AHundredLeaveNothingBehind) {
+  constexpr int kUntilSettled = 10;
+#ifdef ZORVA_SANITIZED
+  constexpr int kCycles = 20;  // each takes ten times as long
+#else
+  constexpr int kCycles = 100;
+#endif
+  // Malloc and the loader keep a little for later use. What came from operator new is counted to the block.
+  constexpr std::size_t kSlack = 64 << 10;
+  const DocumentHost host;
+  const std::string first = everythingAlone();
+  for (int i = 0; i < kUntilSettled; ++i) EXPECT_EQ(first, everythingAlone());
+  const Held before = heldNow();
+  for (int i = 0; i < kCycles; ++i) ASSERT_EQ(first, everythingAlone()) << i;
+  const Held after = heldNow();
+  std::cout << after.blocks << " blocks, heap before " << before.heapBytes << ", after " << after.heapBytes << "\n";
+  EXPECT_EQ(before.blocks, after.blocks);
+  EXPECT_EQ(before.maps, after.maps);
+  EXPECT_EQ(before.files, after.files);
+  EXPECT_LT(after.heapBytes, before.heapBytes + kSlack);
+  EXPECT_EQ(nullptr, ::dlopen(providerLibraryPath().c_str(), RTLD_NOW | RTLD_NOLOAD));
+}
+
+// --- Brokers.
+
+TEST(TwoBrokers, TheLatestThatCalledACreateFunctionIsAsked) {
+  const DocumentHost host;
+  const Library library(providerLibraryPath(), RTLD_LOCAL);
+  for (const auto& [prefix, className, isAssociation] : allProviderNames()) {
+    SCOPED_TRACE(prefix);
+    RecordingBroker first;
+    RecordingBroker second;
+    serveOthers(first);
+    serveOthers(second);
+    const auto create = library.find<InstanceProvider::Create>(std::string(prefix) + "_Create_InstanceMI");
+    InstanceProvider provider(create, first);
+    const Outcome alone = provider.enumerateInstances(Path(className));
+    first.startOver();
+
+    const InstanceProvider later(create, second);
+    EXPECT_EQ(provider.mi(), later.mi()) << "the table is one for both";
+    // With the first broker's objects: what is made comes from the second, what is read and handed out is the first's.
+    const Outcome mixed = provider.enumerateInstances(Path(className));
+    EXPECT_EQ(alone.rc, mixed.rc);
+    EXPECT_EQ(alone.instances(), mixed.instances());
+    EXPECT_EQ(0U, first.callsOf("newObjectPath") + first.callsOf("newInstance"));
+    EXPECT_LT(0U, second.callsOf("newObjectPath"));
+    EXPECT_EQ(mixed.instances().size(), first.callsOf("returnInstance"));
+  }
+}
+
+TEST(TwoBrokers, AnAssociationsCreateFunctionCountsForItsInstancesToo) {
+  const DocumentHost host;
+  const Library library(providerLibraryPath(), RTLD_LOCAL);
+  for (const auto& [prefix, className, isAssociation] : allProviderNames()) {
+    if (!isAssociation) continue;
+    SCOPED_TRACE(prefix);
+    RecordingBroker first;
+    RecordingBroker second;
+    serveOthers(first);
+    serveOthers(second);
+    InstanceProvider instances(library.find<InstanceProvider::Create>(std::string(prefix) + "_Create_InstanceMI"),
+                               first);
+    const AssociationProvider later(
+        library.find<AssociationProvider::Create>(std::string(prefix) + "_Create_AssociationMI"), second);
+    instances.enumerateInstances(Path(className));
+    EXPECT_EQ(0U, first.callsOf("newObjectPath"));
+    EXPECT_LT(0U, second.callsOf("newObjectPath"));
+  }
+}
+
+// Two of the project's own brokers share the library; each gets what it would get alone, in turn and when the other has
+// gone.
+TEST(TwoBrokers, EachGetsItsOwnAnswers) {
+  const DocumentHost host;
+  zorva::broker::BrokerOptions options;
+  options.providerDirectory = ZORVA_LIB_DIR;
+  const auto classes = zorva::schema::loadBuiltInClasses();
+  const auto ask = [](zorva::broker::Broker& broker) {
+    std::vector<zorva::broker::Instance> all;
+    for (const auto& [prefix, className, isAssociation] : allProviderNames()) {
+      const auto status = broker.enumerateInstances("root/cimv2", className, {}, [&](const auto& instance) {
+        all.push_back(instance);
+        return true;
+      });
+      EXPECT_TRUE(status.ok()) << className << ": " << status.message;
+    }
+    return all;
+  };
+  auto first = std::make_unique<zorva::broker::Broker>(classes, options);
+  const auto alone = ask(*first);
+  EXPECT_LT(10U, alone.size());
+  zorva::broker::Broker second(classes, options);
+  for (int i = 0; i < 3; ++i) {
+    EXPECT_EQ(alone, ask(second));
+    EXPECT_EQ(alone, ask(*first));
+  }
+  first.reset();
+  EXPECT_EQ(alone, ask(second));
+}
+
+}  // namespace
+}  // namespace ZV::Test

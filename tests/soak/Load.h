@@ -1,0 +1,73 @@
+// Clients that ask a broker for everything that the twelve providers do, and look at every reply.
+#pragma once
+
+#include <array>
+#include <atomic>
+#include <cstddef>
+#include <random>
+#include <set>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "broker/Broker.h"
+
+namespace ZV::Test {
+
+// The texts that clients write: whole ones of these, or what was there before, is what readers may find.
+inline constexpr const char* kWrittenNames[] = {"alpha.example.org", "bravo.example.org", "gamma.example.org"};
+
+// What the clients of one load know together. All but the counters is set before they start.
+struct Load {
+  Load(zorva::broker::Broker& asked, std::set<std::string> first) : broker(asked), namesAtFirst(std::move(first)) {}
+
+  zorva::broker::Broker& broker;
+  std::set<std::string> namesAtFirst;  // domain and host names of the host before anybody wrote
+
+  std::atomic<std::size_t> reads = 0;
+  std::atomic<std::size_t> traversals = 0;  // of associations
+  std::atomic<std::size_t> changes = 0;
+  std::atomic<std::size_t> methods = 0;
+  std::atomic<std::size_t> objects = 0;   // that came
+  std::atomic<std::size_t> problems = 0;  // replies that are not well-formed, each told as a failure of the test
+};
+
+// One client; belongs to one thread.
+class Client {
+ public:
+  Client(Load& load, unsigned int seed);
+
+  // Makes one request, of a kind that chance chooses, and checks its reply.
+  void request();
+
+  // The objects of a class, which are checked.
+  std::vector<zorva::broker::ObjectPath> names(const char* className);
+
+ private:
+  void read();
+  void readOne();
+  void traverse();
+  void change();
+  void invoke();
+
+  template <typename Number>
+  Number chance(Number count);
+  std::string writtenName();
+  // An object of one of the classes that was there a moment ago; no class where none is known.
+  zorva::broker::ObjectPath anyObject();
+
+  // The sinks of requests: what they are given is checked and remembered.
+  zorva::broker::InstanceSink instances();
+  zorva::broker::PathSink paths();
+  void checkPath(const zorva::broker::ObjectPath& path);
+  void checkTexts(const zorva::broker::Instance& instance);
+  // codes: those that are right beside 0.
+  void checkStatus(const zorva::broker::Status& status, const std::string& request, std::initializer_list<int> codes);
+  void complain(const std::string& what);
+
+  Load& load_;
+  std::mt19937 random_;
+  std::vector<zorva::broker::ObjectPath> known_;
+};
+
+}  // namespace ZV::Test
