@@ -10,14 +10,13 @@ namespace {
 // made for each property that a provider sets. Names that differ in nothing else share a bucket, no more. The bit that
 // sets small letters apart from capitals is left out.
 std::size_t bucketOf(std::string_view name, std::size_t mask) noexcept {
-  constexpr unsigned char kCase = 0x20;
-  std::uint32_t hash = static_cast<std::uint32_t>(name.size());
-  if (!name.empty()) {
-    for (const std::size_t place : {std::size_t{0}, name.size() / 3, name.size() / 2, name.size() - 1}) {
-      hash = (hash ^ (static_cast<unsigned char>(name[place]) | kCase)) * 16777619U;
-    }
-  }
-  return (hash ^ hash >> 15) & mask;
+  constexpr std::uint32_t kSmallLetters = 0x20202020;
+  if (name.empty()) return 0;
+  const auto at = [&](std::size_t place) { return static_cast<std::uint32_t>(static_cast<unsigned char>(name[place])); };
+  const std::size_t size = name.size();
+  const std::uint32_t letters = at(0) | at(size / 3) << 8 | at(size / 2) << 16 | at(size - 1) << 24;
+  const std::uint32_t hash = ((letters | kSmallLetters) ^ static_cast<std::uint32_t>(size)) * 2654435769U;
+  return (hash >> 16) & mask;
 }
 
 }  // namespace

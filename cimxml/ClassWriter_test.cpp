@@ -47,9 +47,9 @@ class ClassWriterTest : public ::testing::Test {
 };
 
 TEST_F(ClassWriterTest, WritesWhatTheClassItselfDeclares) {
-  EXPECT_EQ(
-      written("T_Derived", {true, false, false, {}}),
-      R"(<CLASS NAME="T_Derived" SUPERCLASS="T_Base"><PROPERTY NAME="Kind" TYPE="uint16"><VALUE>7</VALUE></PROPERTY></CLASS>)");
+  EXPECT_EQ(written("T_Derived", {true, false, false, {}}),
+            R"(<CLASS NAME="T_Derived" SUPERCLASS="T_Base"><PROPERTY NAME="Kind" TYPE="uint16">)"
+            R"(<VALUE>7</VALUE></PROPERTY></CLASS>)");
 }
 
 TEST_F(ClassWriterTest, MarksWhatIsInheritedAndWhereItIsFrom) {

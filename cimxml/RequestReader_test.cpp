@@ -117,9 +117,11 @@ TEST(RequestReader, ReadsPathsOfOtherHosts) {
 
 TEST(RequestReader, ReadsInstances) {
   const auto instance = std::get<broker::Instance>(readParameter(
-      R"(<INSTANCE CLASSNAME="C"><QUALIFIER NAME="Q" TYPE="boolean"/><PROPERTY NAME="A" TYPE="string"><VALUE/></PROPERTY>)"
+      R"(<INSTANCE CLASSNAME="C"><QUALIFIER NAME="Q" TYPE="boolean"/><PROPERTY NAME="A" TYPE="string">)"
+      R"(<VALUE/></PROPERTY>)"
       R"(<PROPERTY NAME="B" TYPE="uint16"><VALUE> 5 </VALUE></PROPERTY><PROPERTY NAME="C" TYPE="string"></PROPERTY>)"
-      R"(<PROPERTY.ARRAY NAME="D" TYPE="uint8"><VALUE.ARRAY><VALUE>1</VALUE><VALUE.NULL/></VALUE.ARRAY></PROPERTY.ARRAY>)"
+      R"(<PROPERTY.ARRAY NAME="D" TYPE="uint8"><VALUE.ARRAY><VALUE>1</VALUE><VALUE.NULL/></VALUE.ARRAY>)"
+      R"(</PROPERTY.ARRAY>)"
       R"(<PROPERTY.REFERENCE NAME="E"><VALUE.REFERENCE><INSTANCENAME CLASSNAME="X"/></VALUE.REFERENCE>)"
       R"(</PROPERTY.REFERENCE><PROPERTY NAME="F" TYPE="char16"><VALUE>é</VALUE></PROPERTY></INSTANCE>)"));
   EXPECT_EQ(instance.path.className, "C");

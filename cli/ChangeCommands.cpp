@@ -20,6 +20,7 @@ namespace {
 template <class Element>
 std::string namesOf(const std::vector<Element>& elements) {
   std::vector<std::string> names;
+  names.reserve(elements.size());
   for (const auto& element : elements) names.push_back(element->name);
   return joined(names, ", ");
 }
@@ -81,6 +82,7 @@ void modifyInstance(const Arguments& arguments) {
   const broker::ObjectPath path = resolvePath(session, arguments.target);
   const schema::Class& declared = session.classNamed(path.className);
   std::vector<broker::Property> changes;
+  changes.reserve(assignments.size());
   for (const Assignment& assignment : assignments) changes.push_back(parseChange(declared, assignment));
 
   const ChangeOptions options{arguments.only, arguments.dryRun};
@@ -99,6 +101,7 @@ void invokeMethod(const Arguments& arguments) {
   const broker::ObjectPath path = resolvePath(session, arguments.target);
   const schema::ClassMethod& method = methodNamed(session.classNamed(path.className), arguments.method);
   std::vector<broker::NamedValue> input;
+  input.reserve(assignments.size());
   for (const Assignment& assignment : assignments) input.push_back(parseParameter(method, assignment));
 
   broker::MethodResult result;

@@ -117,10 +117,11 @@ TEST(Show, TellsOfValuesThatWereSet) {
 
 TEST(Show, LeavesOutWhatProvidersLogOnTheirWayUnlessALevelIsAskedFor) {
   const TestHost host;
-  host.writeTree(
-      R"({"system_name": "host1", "nodes": [{"type": "System", "name": "system", "description": "Computer", "children": [)" +
-      TestHost::port("eth0") + R"(]}, {"type": "System", "name": "sp", "description": "BMC", "children": [)" +
-      TestHost::port("mgmt0") + "]}]}");
+  host.writeTree(R"({"system_name": "host1", "nodes": [{"type": "System", "name": "system", "description": "Computer",)"
+                 R"("children": [)" +
+                 TestHost::port("eth0") +
+                 R"(]}, {"type": "System", "name": "sp", "description": "BMC", "children": [)" +
+                 TestHost::port("mgmt0") + "]}]}");
   for (const char* command : {"show", "classes", "graph"}) EXPECT_EQ(host.run({command}).err, "") << command;
   EXPECT_THAT(host.run({"show", "--log-level", "6000"}).err, HasSubstr("Key is not matched"));
 }

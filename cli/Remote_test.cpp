@@ -32,7 +32,8 @@ void makeWorld(const TestHost& host) {
   const std::string addresses = R"("addresses": [{"address": "192.0.2.10", "prefix_length": 24, "origin": "static"},)"
                                 R"({"address": "2001:db8::10", "prefix_length": 64, "origin": "slaac"}])";
   host.writeTree(
-      R"({"system_name": "host1", "nodes": [{"type": "System", "name": "system", "description": "Computer", "children": [)" +
+      R"({"system_name": "host1", "nodes": [{"type": "System", "name": "system", "description": "Computer",)"
+      R"("children": [)" +
       TestHost::port("eth0", R"("domain_name": "example.org", "dns_suffixes": ["a&b", "<\"x y\">"], )" + addresses) +
       "," + TestHost::port("\u7db2\u8def") +
       R"(]}, {"type": "System", "name": "sp", "description": "BMC", "children": [)" +

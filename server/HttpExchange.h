@@ -40,7 +40,7 @@ class HttpExchange final : public ResponseSink {
   using Clock = std::chrono::steady_clock;
 
   static constexpr std::size_t kWhole = std::size_t{64} << 10;
-  static constexpr std::size_t kMostHeld = std::size_t{256} << 10;
+  static constexpr std::size_t kMostHeld = std::size_t{128} << 10;
 
   HttpExchange(MHD_Connection* connection, std::shared_ptr<Connection> client, std::string path);
 

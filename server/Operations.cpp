@@ -1,5 +1,7 @@
 #include "server/Operations.h"
 
+#include <algorithm>
+
 #include "broker/PathText.h"
 #include "cimxml/ElementWriter.h"
 #include "cmpidt.h"
@@ -84,6 +86,34 @@ bool isNameOfASystem(const Operation& operation, std::string_view host) {
   return found;
 }
 
+/// Whether a name has all the keys that were given.
+bool hasKeys(const broker::ObjectPath& name, const broker::ObjectPath& given) {
+  return schema::sameName(name.className, given.className) &&
+         std::all_of(given.keys.begin(), given.keys.end(), [&name](const broker::NamedValue& key) {
+           const broker::Value* value = name.key(key.name);
+           return value != nullptr && *value == key.value;
+         });
+}
+
+/// Clients leave out keys that tell them nothing. Where one instance alone has those that they give, it is meant; else
+/// the provider decides.
+void completeKeys(const Operation& operation, broker::ObjectPath& path) {
+  const schema::Class* declared = operation.classes().find(path.className);
+  broker::ObjectPath given;
+  if (declared == nullptr || path.keys.empty() || path.keys.size() >= declared->keys().size() ||
+      !operation.broker.canonicalPath(path, given).ok()) {
+    return;
+  }
+  std::vector<broker::ObjectPath> found;
+  const broker::PathSink look = [&](const broker::ObjectPath& name) {
+    if (hasKeys(name, given)) found.push_back(name);
+    return found.size() < 2;
+  };
+  const Status status =
+      operation.broker.enumerateInstanceNames(operation.nameSpace, path.className, look, operation.caller);
+  if (status.ok() && found.size() == 1) path.keys = std::move(found.front().keys);
+}
+
 }  // namespace
 
 Status settlePath(const Operation& operation, broker::ObjectPath& path) {
@@ -105,6 +135,7 @@ Status settlePath(const Operation& operation, broker::ObjectPath& path) {
     }
     key.name = declared->keys().front()->name;
   }
+  completeKeys(operation, path);
   return {};
 }
 

@@ -46,7 +46,8 @@ OperationFunction findPullOperation(std::string_view name) noexcept;
 broker::Status invokeMethod(Operation& operation);
 
 /// The path as the broker takes it: in the call's namespace, the host left out where it is this one, in references too,
-/// a nameless key under its name. A path of another host is CIM_ERR_INVALID_PARAMETER.
+/// a nameless key under its name, and keys that are left out added where they can only be those of one instance. A path
+/// of another host is CIM_ERR_INVALID_PARAMETER.
 broker::Status settlePath(const Operation& operation, broker::ObjectPath& path);
 /// The same for the references among a value.
 void settleValue(const Operation& operation, broker::Value& value);

@@ -1,5 +1,6 @@
 #include "server/Service.h"
 
+#include <algorithm>
 #include <exception>
 
 #include "broker/PathText.h"
@@ -94,9 +95,12 @@ class ServiceCore {
 
   void reclaim() { pulls_.reclaim(); }
 
-  void log(LogLevel level, const std::string& text) const noexcept {
+  /// What clients send stands in these lines: it must not look like a line of its own.
+  void log(LogLevel level, std::string text) const noexcept {
     if (!options_.log) return;
     try {
+      std::replace_if(
+          text.begin(), text.end(), [](unsigned char c) { return c < 0x20 || c == 0x7F; }, '?');
       options_.log(level, text);
     } catch (...) {
       // A log that fails must not fail the request.

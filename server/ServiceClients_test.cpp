@@ -139,6 +139,13 @@ TEST_F(Wbemcli, ReadsInstances) {
   EXPECT_THAT(ask("gp", kEndpoint, {"Hostname"}), HasSubstr("host1"));
 }
 
+TEST_F(Wbemcli, MayLeaveOutKeysThatSayNothing) {
+  const std::string brief = "root/cimv2:ZORVA_DNSProtocolEndPoint.Name=\"eth0\"";
+  EXPECT_THAT(ask("gi", brief), HasSubstr("Hostname=\"host1\""));
+  EXPECT_EQ(ask("ain", brief), ask("ain", kEndpoint));
+  EXPECT_THAT(ask("gi", "root/cimv2:ZORVA_DNSProtocolEndPoint.Name=\"eth7\""), HasSubstr("(6) CIM_ERR_NOT_FOUND"));
+}
+
 TEST_F(Wbemcli, WalksAssociations) {
   EXPECT_THAT(ask("ain", kEndpoint),
               AllOf(HasSubstr("ZORVA_RemoteServiceAccessPoint."), HasSubstr("ZORVA_ComputerSystem."),

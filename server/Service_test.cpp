@@ -228,6 +228,13 @@ TEST(Service, AnswersOnManyThreadsAtOnce) {
   EXPECT_EQ(answered, 100);
 }
 
+TEST(Service, LogsNoLinesThatAClientMakesUp) {
+  TestService service;
+  service.ask("GetClass", className("ClassName", "No&#10;2026 forged"));
+  for (const std::string& line : service.lines()) EXPECT_THAT(line, Not(HasSubstr("\n")));
+  EXPECT_THAT(service.lines(), Contains(HasSubstr("No?2026 forged")));
+}
+
 TEST(Service, LogsEachOperationThatFails) {
   TestService service;
   service.ask("GetClass", className("ClassName", "No"));

@@ -16,8 +16,8 @@ struct FileText {
 // blocks nor is waited for. Throws std::bad_alloc alone.
 FileText readFile(const std::string& path, std::size_t limit);
 
-// Whether an error number of FileText tells of the moment and not of the file: no descriptor or memory was left, the disk
-// failed. What is read again later may be there, and nothing reports that it is.
+// Whether an error number of FileText tells of the moment and not of the file: no descriptor or memory was left, the
+// disk failed. What is read again later may be there, and nothing reports that it is.
 bool mayPass(int error);
 
 // What an error number of FileText means, in words.

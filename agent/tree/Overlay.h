@@ -62,8 +62,8 @@ class OverlayReader {
  public:
   explicit OverlayReader(const std::string& dataDir) : overlay_(dataDir) {}
 
-  // Whether the file may have changed since it was read last, or could not be read then for a reason that may pass; true
-  // before the first time. Never blocks.
+  // Whether the file may have changed since it was read last, or could not be read then for a reason that may pass;
+  // true before the first time. Never blocks.
   bool changed() { return watch_.changed() || unreadable_; }
 
   // Reads the file. A file that is wrong is logged and counts as empty: what the host says can still be read. Where it
