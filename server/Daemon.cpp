@@ -88,7 +88,7 @@ void applyLog(const Config& config) {
 
 ServiceOptions serviceOptions(const Config& config) {
   ServiceOptions options;
-  options.log = logBrokerLine;
+  options.log = logServiceLine;
   options.maxDepth = static_cast<std::size_t>(config.nesting);
   options.pullDefaultTimeout = std::chrono::seconds(config.pullSeconds);
   options.pullMaxTimeout = std::chrono::seconds(config.pullLongestSeconds);
@@ -149,10 +149,14 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
   listeners_ = inherited > 0 ? adoptListeners(inherited) : listenOn(config_.addresses, config_.port);
   broker_ = makeBroker(config_);
   service_ = std::make_unique<Service>(*broker_, serviceOptions(config_));
-  server_ = std::make_unique<HttpServer>(config_.limits, config_.threads,
-                                         [service = service_.get()](const HttpRequest& request, ResponseSink& sink) {
-                                           service->handle(request, sink, callerOf(request));
-                                         });
+  server_ = std::make_unique<HttpServer>(
+      config_.limits, config_.threads,
+      [service = service_.get()](const HttpRequest& request, ResponseSink& sink) {
+        service->handle(request, sink, callerOf(request));
+      },
+      [service = service_.get()](const HttpRequest& request, const std::string& why, ResponseSink& sink) {
+        service->handleLate(request, why, sink);
+      });
 }
 
 void Daemon::greet() const {

@@ -23,6 +23,11 @@ void writeLine(int level, const std::string& text, const char* function, const c
   ZALog::ZALogger::logLevelMessage(function, file, line, category, level, nullptr, 0, 0, text);
 }
 
+int numberOf(broker::LogLevel level) {
+  constexpr int kLevels[] = {3000, 4000, 5000, 6000};
+  return kLevels[static_cast<std::size_t>(level)];
+}
+
 /// Counts lines second by second.
 class Flood {
  public:
@@ -74,9 +79,14 @@ void logClientLine(Level level, const std::string& text, const char* function, c
   // Lost, as a line that cannot be written.
 }
 
+void logServiceLine(broker::LogLevel level, std::string_view text) noexcept try {
+  logClientLine(static_cast<Level>(numberOf(level)), std::string(text), "service", __FILE__, __LINE__);
+} catch (...) {
+  // Lost, as a line that cannot be written.
+}
+
 void logBrokerLine(broker::LogLevel level, std::string_view text) noexcept try {
-  constexpr int kLevels[] = {3000, 4000, 5000, 6000};
-  const int number = kLevels[static_cast<std::size_t>(level)];
+  const int number = numberOf(level);
   if (number >= threshold.load(std::memory_order_relaxed)) {
     writeLine(number, std::string(text), "broker", __FILE__, __LINE__);
   }

@@ -76,7 +76,8 @@ class ServiceCore {
   ServiceCore(broker::Broker& broker, ServiceOptions options)
       : broker_(broker), options_(std::move(options)), host_(options_.hostName), pulls_(pullLimits(options_)) {}
 
-  void handle(const HttpRequest& http, ResponseSink& sink, broker::Caller caller) {
+  /// `instead`, where there is one, stands for what each operation comes to.
+  void handle(const HttpRequest& http, ResponseSink& sink, broker::Caller caller, const Status* instead = nullptr) {
     CimHeaders headers;
     cimxml::CimRequest request;
     std::optional<HttpRefusal> refusal = readHeaders(http, headers);
@@ -90,7 +91,7 @@ class ServiceCore {
     if (refusal) return refuse(*refusal, sink);
     caller.acceptLanguage = headers.acceptLanguage;
     caller.contentLanguage = headers.contentLanguage;
-    answer(request, headers, caller, sink);
+    answer(request, headers, caller, sink, instead);
   }
 
   void reclaim() { pulls_.reclaim(); }
@@ -118,7 +119,7 @@ class ServiceCore {
   }
 
   void answer(const cimxml::CimRequest& request, const CimHeaders& headers, const broker::Caller& caller,
-              ResponseSink& sink) {
+              ResponseSink& sink, const Status* instead) {
     Buffer buffer;
     cimxml::ResponseWriter writer(buffer.text(), options_.unsentText, [&](std::string_view text) {
       if (!sink.begun()) sink.begin(200, responseHeaders(headers));
@@ -128,7 +129,7 @@ class ServiceCore {
     for (const cimxml::Call& call : request.calls) {
       writer.beginResponse(call.name, call.isExtrinsic);
       Operation operation{broker_, pulls_, host_, caller, call, writer, headers.host, {}};
-      const Status status = carryOutSafely(operation);
+      const Status status = instead != nullptr ? *instead : carryOutSafely(operation);
       if (!status.ok()) {
         const std::string text(broker::statusName(status.rc));
         log(LogLevel::Info, call.name + " in " + broker::quotedText(call.target.nameSpace.substr(0, 200)) + ": " +
@@ -173,6 +174,11 @@ void Service::handle(const HttpRequest& request, ResponseSink& sink, const broke
     sink.begin(500, {{"Content-Type", "text/plain; charset=\"utf-8\""}});
     sink.write("the server cannot answer\n");
   }
+}
+
+void Service::handleLate(const HttpRequest& request, const std::string& why, ResponseSink& sink) {
+  const Status failed{CMPI_RC_ERR_FAILED, why};
+  core_->handle(request, sink, {}, &failed);
 }
 
 void Service::reclaim() { core_->reclaim(); }

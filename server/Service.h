@@ -50,6 +50,10 @@ class Service {
   /// `caller` is who asks, as far as that is known.
   void handle(const HttpRequest& request, ResponseSink& sink, const broker::Caller& caller = {});
 
+  /// The answer to a request whose handle() has not returned in time, and may still be running: each of its operations
+  /// has failed, for that reason. Asks no provider.
+  void handleLate(const HttpRequest& request, const std::string& why, ResponseSink& sink);
+
   /// Ends pulled enumerations whose client has not come back in time; cheap. They are looked at with each request too.
   void reclaim();
 
