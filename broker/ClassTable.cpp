@@ -12,7 +12,9 @@ namespace {
 std::size_t bucketOf(std::string_view name, std::size_t mask) noexcept {
   constexpr std::uint32_t kSmallLetters = 0x20202020;
   if (name.empty()) return 0;
-  const auto at = [&](std::size_t place) { return static_cast<std::uint32_t>(static_cast<unsigned char>(name[place])); };
+  const auto at = [&](std::size_t place) {
+    return static_cast<std::uint32_t>(static_cast<unsigned char>(name[place]));
+  };
   const std::size_t size = name.size();
   const std::uint32_t letters = at(0) | at(size / 3) << 8 | at(size / 2) << 16 | at(size - 1) << 24;
   const std::uint32_t hash = ((letters | kSmallLetters) ^ static_cast<std::uint32_t>(size)) * 2654435769U;

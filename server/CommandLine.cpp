@@ -39,9 +39,7 @@ void addOptions(CLI::App& app, CommandLine& line) {
   app.add_flag("--greet", line.greet, "Print how to ask this server something, as on a terminal");
 }
 
-std::string absolute(const std::string& path) {
-  return path.empty() ? path : std::filesystem::absolute(path).string();
-}
+std::string absolute(const std::string& path) { return path.empty() ? path : std::filesystem::absolute(path).string(); }
 
 }  // namespace
 

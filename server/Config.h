@@ -31,10 +31,10 @@ struct Config {
   int threads = 2;  ///< that do the input and output; not those that wait for providers
 
   // [pull]
-  int pullContexts = 100;       ///< enumerations that are open at once
-  int pullSeconds = 60;         ///< how long one stays open unasked where the client says nothing
-  int pullLongestSeconds = 600; ///< the longest that a client may ask for
-  int pullMebibytes = 64;       ///< what all of them hold
+  int pullContexts = 100;        ///< enumerations that are open at once
+  int pullSeconds = 60;          ///< how long one stays open unasked where the client says nothing
+  int pullLongestSeconds = 600;  ///< the longest that a client may ask for
+  int pullMebibytes = 64;        ///< what all of them hold
 
   // [agent]
   std::string agentConfig;        ///< the agent's own configuration; empty: where the agent looks for it

@@ -145,7 +145,8 @@ TEST_F(ServerConfig, AnErrorNamesFileLineAndKey) {
             "zorvacimd.toml:2: listen.addresses: expected a list of addresses such as [\"127.0.0.1\"]");
   EXPECT_EQ(wrong("\n[tls]\n"), "zorvacimd.toml:2: tls: is not a known table or key");
   EXPECT_EQ(wrong("http = 1\n"), "zorvacimd.toml:1: http: expected a table");
-  EXPECT_EQ(wrong("[limits]\narrival_seconds = 0\n"), "zorvacimd.toml:2: limits.arrival_seconds: must be from 1 to 86400");
+  EXPECT_EQ(wrong("[limits]\narrival_seconds = 0\n"),
+            "zorvacimd.toml:2: limits.arrival_seconds: must be from 1 to 86400");
   EXPECT_EQ(wrong("[pull]\ndefault_seconds = 9\nlongest_seconds = 8\n"),
             "zorvacimd.toml:2: pull.default_seconds: must not be more than pull.longest_seconds");
   EXPECT_THAT(wrong("[listen\n"), ::testing::StartsWith("zorvacimd.toml:1: "));
@@ -159,8 +160,8 @@ TEST_F(ServerConfig, WhatIsNoFileIsAnErrorAndNoWait) {
 TEST_F(ServerConfig, TheCommandLineHoldsOverTheFile) {
   directory_.write("zorvacimd.toml", "[listen]\nport = 1\n[log]\nlevel = 2\n");
   const std::string file = directory_ / "zorvacimd.toml";
-  const char* words[] = {"zorvacimd", "--config", file.c_str(), "--port", "7", "--listen", "::1", "--listen",
-                         "127.0.0.3"};
+  const char* words[] = {"zorvacimd", "--config", file.c_str(), "--port",   "7",
+                         "--listen",  "::1",      "--listen",   "127.0.0.3"};
   const auto line = readCommandLine(static_cast<int>(std::size(words)), words);
   const Config config = configOf(std::get<CommandLine>(line));
   EXPECT_EQ(config.port, 7);

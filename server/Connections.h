@@ -51,8 +51,8 @@ class Connection {
   std::atomic<bool> proven_ = false;
   std::atomic<std::size_t> held_ = 0;
   // Under the table's lock.
-  int socket_;           ///< -1: closed
-  bool isCut_ = false;   ///< shut down; the HTTP library is about to close it
+  int socket_;          ///< -1: closed
+  bool isCut_ = false;  ///< shut down; the HTTP library is about to close it
   std::size_t place_ = 0;
 };
 

@@ -25,7 +25,6 @@
 #include "server/Interop.h"
 #include "server/Listener.h"
 #include "server/Log.h"
-#include "server/RequestHead.h"
 #include "server/Service.h"
 #include "server/Systemd.h"
 
@@ -81,8 +80,7 @@ sigset_t handledSignals() {
 }
 
 void applyLog(const Config& config) {
-  zorvagent::setLogTarget(zorvagent::LogStream::Log,
-                          config.logTarget.value_or(zorvagent::currentConfig().logTarget));
+  zorvagent::setLogTarget(zorvagent::LogStream::Log, config.logTarget.value_or(zorvagent::currentConfig().logTarget));
   setLogLevel(config.logLevel);
 }
 
@@ -95,15 +93,6 @@ ServiceOptions serviceOptions(const Config& config) {
   options.maxPulls = static_cast<std::size_t>(config.pullContexts);
   options.maxPullBytes = static_cast<std::size_t>(config.pullMebibytes) << 20;
   return options;
-}
-
-broker::Caller callerOf(const HttpRequest& request) {
-  broker::Caller caller;
-  if (const std::string* language = findHeader(request.headers, "Accept-Language")) caller.acceptLanguage = *language;
-  if (const std::string* language = findHeader(request.headers, "Content-Language")) {
-    caller.contentLanguage = *language;
-  }
-  return caller;
 }
 
 class Daemon {
@@ -151,9 +140,7 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
   service_ = std::make_unique<Service>(*broker_, serviceOptions(config_));
   server_ = std::make_unique<HttpServer>(
       config_.limits, config_.threads,
-      [service = service_.get()](const HttpRequest& request, ResponseSink& sink) {
-        service->handle(request, sink, callerOf(request));
-      },
+      [service = service_.get()](const HttpRequest& request, ResponseSink& sink) { service->handle(request, sink); },
       [service = service_.get()](const HttpRequest& request, const std::string& why, ResponseSink& sink) {
         service->handleLate(request, why, sink);
       });
@@ -199,8 +186,8 @@ void Daemon::acceptFrom(const Listener& listener) {
   for (int i = 0; i < kAtOnce; ++i) {
     sockaddr_storage peer{};
     socklen_t size = sizeof peer;
-    const int socket = ::accept4(listener.socket.get(), reinterpret_cast<sockaddr*>(&peer), &size,
-                                 SOCK_NONBLOCK | SOCK_CLOEXEC);
+    const int socket =
+        ::accept4(listener.socket.get(), reinterpret_cast<sockaddr*>(&peer), &size, SOCK_NONBLOCK | SOCK_CLOEXEC);
     if (socket >= 0) {
       server_->take(socket, peer, size);
       continue;

@@ -22,11 +22,11 @@ namespace {
 
 using std::chrono::milliseconds;
 using std::chrono::seconds;
+using ::testing::HasSubstr;
+using ::testing::StartsWith;
 using testing::TestDaemon;
 using testing::Wire;
 using testing::WireResponse;
-using ::testing::HasSubstr;
-using ::testing::StartsWith;
 
 const std::string kEndpoints = testing::enumeration("EnumerateInstanceNames", "ZORVA_DNSProtocolEndPoint");
 
@@ -50,8 +50,8 @@ TEST(Daemon, AnswersWithTheInstancesOfTheHost) {
 struct Hostile {
   const char* name;
   std::string bytes;
-  int status;              ///< 0: the connection is closed without an answer
-  const char* logged;      ///< part of a line of the log; null: none is made
+  int status;          ///< 0: the connection is closed without an answer
+  const char* logged;  ///< part of a line of the log; null: none is made
 };
 
 std::string withHead(const std::string& fields, const std::string& body = {}) {

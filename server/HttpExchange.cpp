@@ -103,9 +103,13 @@ void HttpExchange::append(std::string_view text) {
 
 void HttpExchange::startStreaming() {
   streaming_ = true;
+  // They change places, and neither has to grow on the way.
+  held_.reserve(kMostHeld + kWhole);
+  outgoing_.reserve(kMostHeld + kWhole);
   if (takesGzip) {
     gzip_ = std::make_unique<Gzip>();
-    const std::string plain = std::exchange(held_, {});
+    const std::string plain = held_;
+    held_.clear();
     gzip_->add(plain, held_);
   }
   publish();
@@ -214,9 +218,7 @@ bool HttpExchange::awaitOrSuspend(std::chrono::microseconds moment) {
   return false;
 }
 
-bool HttpExchange::isPublished() const {
-  return published_.load(std::memory_order_acquire);
-}
+bool HttpExchange::isPublished() const { return published_.load(std::memory_order_acquire); }
 
 MHD_Result HttpExchange::respond() {
   response_ = makeResponse();

@@ -89,8 +89,7 @@ class HttpServer::Core {
                               const char* version, const char* data, std::size_t* size, void** holder);
   static void* onRequestLine(void* core, const char* uri, MHD_Connection* connection);
   static void onCompleted(void* core, MHD_Connection* connection, void** holder, MHD_RequestTerminationCode code);
-  static void onConnection(void* core, MHD_Connection* connection, void** context,
-                           MHD_ConnectionNotificationCode code);
+  static void onConnection(void* core, MHD_Connection* connection, void** context, MHD_ConnectionNotificationCode code);
   static void onLog(void* core, const char* format, va_list arguments);
 
   MHD_Result readHead(Holder& exchange, MHD_Connection* connection, const char* method, const char* version);
@@ -132,16 +131,16 @@ void HttpServer::Core::startDaemon(int threads) {
   constexpr unsigned kMostConnections = 1U << 20;
   // Strings are compared by the header's rules for each: strict where leniency would let requests be smuggled.
   constexpr int kStrict = 1;
-  daemon_ = MHD_start_daemon(                                                             //
-      kFlags, 0, nullptr, nullptr, &Core::onRequest, this,                                //
-      MHD_OPTION_EXTERNAL_LOGGER, &Core::onLog, this,                                     //
-      MHD_OPTION_THREAD_POOL_SIZE, static_cast<unsigned>(threads),                        //
-      MHD_OPTION_CONNECTION_LIMIT, kMostConnections,                                      //
-      MHD_OPTION_CONNECTION_MEMORY_LIMIT, limits_.headerBytes,                            //
-      MHD_OPTION_STRICT_FOR_CLIENT, kStrict,                                              //
-      MHD_OPTION_SIGPIPE_HANDLED_BY_APP, 1,                                               //
-      MHD_OPTION_URI_LOG_CALLBACK, &Core::onRequestLine, this,                            //
-      MHD_OPTION_NOTIFY_COMPLETED, &Core::onCompleted, this,                              //
+  daemon_ = MHD_start_daemon(                                       //
+      kFlags, 0, nullptr, nullptr, &Core::onRequest, this,          //
+      MHD_OPTION_EXTERNAL_LOGGER, &Core::onLog, this,               //
+      MHD_OPTION_THREAD_POOL_SIZE, static_cast<unsigned>(threads),  //
+      MHD_OPTION_CONNECTION_LIMIT, kMostConnections,                //
+      MHD_OPTION_CONNECTION_MEMORY_LIMIT, limits_.headerBytes,      //
+      MHD_OPTION_STRICT_FOR_CLIENT, kStrict,                        //
+      MHD_OPTION_SIGPIPE_HANDLED_BY_APP, 1,                         //
+      MHD_OPTION_URI_LOG_CALLBACK, &Core::onRequestLine, this,      //
+      MHD_OPTION_NOTIFY_COMPLETED, &Core::onCompleted, this,        //
       MHD_OPTION_NOTIFY_CONNECTION, &Core::onConnection, this, MHD_OPTION_END);
   if (daemon_ == nullptr) throw std::runtime_error("the HTTP threads cannot be started");
 }
@@ -248,8 +247,8 @@ MHD_Result HttpServer::Core::readHead(Holder& exchange, MHD_Connection* connecti
       connection, MHD_HEADER_KIND,
       [](void* headers, MHD_ValueKind, const char* name, std::size_t nameSize, const char* value,
          std::size_t valueSize) {
-        static_cast<HeaderList*>(headers)->emplace_back(std::string(name, nameSize),
-                                                        value == nullptr ? std::string() : std::string(value, valueSize));
+        static_cast<HeaderList*>(headers)->emplace_back(
+            std::string(name, nameSize), value == nullptr ? std::string() : std::string(value, valueSize));
         return MHD_YES;
       },
       &request.headers);
@@ -271,7 +270,8 @@ void HttpServer::Core::readBody(HttpExchange& exchange, std::string_view data) {
   const HttpLimits now = limits();
   std::string& body = exchange.request.body;
   if (data.size() > now.bodyBytes - std::min(body.size(), now.bodyBytes)) {
-    exchange.refusal = Refusal{413, "the body is longer than the " + std::to_string(now.bodyBytes) + " bytes allowed", {}};
+    exchange.refusal =
+        Refusal{413, "the body is longer than the " + std::to_string(now.bodyBytes) + " bytes allowed", {}};
     releaseBody(exchange);
     return;
   }
@@ -327,10 +327,11 @@ void HttpServer::Core::logRefusal(const HttpExchange& exchange, const Refusal& r
 void HttpServer::Core::logAnswer(const HttpExchange& exchange) const {
   if (!isLogged(Level::Request) || exchange.status() == 0) return;
   const std::string* operation = findHeader(exchange.request.headers, "CIMMethod");
-  const auto time = std::chrono::duration_cast<std::chrono::microseconds>(HttpExchange::Clock::now() - exchange.arrived());
+  const auto time =
+      std::chrono::duration_cast<std::chrono::microseconds>(HttpExchange::Clock::now() - exchange.arrived());
   ZORVA_LOG(Request, exchange.client->peer() + " " + exchange.request.method + " " + exchange.request.path + " " +
-                        (operation == nullptr ? "-" : *operation) + ": " + std::to_string(exchange.status()) + ", " +
-                        std::to_string(exchange.bytesSent()) + " bytes, " + std::to_string(time.count()) + " us");
+                         (operation == nullptr ? "-" : *operation) + ": " + std::to_string(exchange.status()) + ", " +
+                         std::to_string(exchange.bytesSent()) + " bytes, " + std::to_string(time.count()) + " us");
 }
 
 void HttpServer::Core::onLog(void*, const char* format, va_list arguments) {

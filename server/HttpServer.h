@@ -25,8 +25,8 @@ class HttpServer {
   /// handler may still be running.
   using LateHandler = std::function<void(const HttpRequest&, const std::string& why, ResponseSink&)>;
 
-  /// `lateHandler` may be empty: the answer is then a status of 500 with a sentence. Throws std::runtime_error where the
-  /// threads cannot be started.
+  /// `lateHandler` may be empty: the answer is then a status of 500 with a sentence. Throws std::runtime_error where
+  /// the threads cannot be started.
   HttpServer(const HttpLimits& limits, int threads, Handler handler, LateHandler lateHandler = {});
 
   /// Ends all connections, and waits for handlers that have not returned.

@@ -12,7 +12,9 @@
 #include <mutex>
 #include <thread>
 
+#include "server/Daemon.h"
 #include "server/Listener.h"
+#include "server/Service.h"
 #include "server/TestWire.h"
 
 namespace zorva::server {
@@ -20,9 +22,9 @@ namespace {
 
 using std::chrono::milliseconds;
 using std::chrono::seconds;
+using ::testing::HasSubstr;
 using testing::Wire;
 using testing::WireResponse;
-using ::testing::HasSubstr;
 
 const HeaderList kXml{{"Content-Type", "application/xml; charset=\"utf-8\""}};
 
@@ -56,9 +58,9 @@ class Gate {
 /// An HTTP server on a free port, with a thread that accepts and sweeps.
 class Server {
  public:
-  explicit Server(HttpServer::Handler handler, const HttpLimits& limits = {})
+  explicit Server(HttpServer::Handler handler, const HttpLimits& limits = {}, HttpServer::LateHandler late = {})
       : listeners_(listenOn(Addresses{"127.0.0.1"}, 0)),
-        server_(limits, 2, std::move(handler)),
+        server_(limits, 2, std::move(handler), std::move(late)),
         thread_([this] { run(); }) {}
   ~Server() {
     ending_ = true;
@@ -271,6 +273,27 @@ TEST(HttpServer, AHandlerThatDoesNotReturnIsGivenUpAndTheOthersGoOn) {
   EXPECT_EQ(other.receive().body, "go") << "the only worker is stuck, another takes its place";
   ASSERT_TRUE(hanging.send(testing::posting("again")));
   EXPECT_EQ(hanging.receive().body, "again") << "its connection goes on as well";
+  gate.open();
+}
+
+TEST(HttpServer, AProviderThatDoesNotReturnIsAnErrorOfItsOperation) {
+  Config config;
+  config.providerDirectory = ZORVA_LIB_DIR;
+  const auto broker = makeBuiltInBroker(config);
+  Service service(*broker);
+  HttpLimits limits;
+  limits.provider = milliseconds(200);
+  Gate gate;
+  Server server([&](const HttpRequest&, ResponseSink&) { gate.wait(); }, limits,
+                [&](const HttpRequest& request, const std::string& why, ResponseSink& sink) {
+                  service.handleLate(request, why, sink);
+                });
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send(testing::enumeration("EnumerateInstanceNames", "ZORVA_DNSProtocolEndPoint")));
+  const WireResponse response = wire.receive();
+  EXPECT_EQ(response.status, 200);
+  EXPECT_THAT(response.body, HasSubstr("<IMETHODRESPONSE NAME=\"EnumerateInstanceNames\"><ERROR CODE=\"1\""));
+  EXPECT_THAT(response.body, HasSubstr("did not return within 200 ms"));
   gate.open();
 }
 

@@ -67,7 +67,8 @@ sockaddr_storage parseLoopback(const std::string& text, int port) {
     throw std::invalid_argument("'" + text + "' is no address to listen on; give one such as 127.0.0.1 or ::1");
   }
   if (!isLoopback(*address)) {
-    throw std::invalid_argument("'" + text + "' is no loopback address: this server does not ask who its clients are, "
+    throw std::invalid_argument("'" + text +
+                                "' is no loopback address: this server does not ask who its clients are, "
                                 "so it listens on 127.0.0.1 and ::1 only");
   }
   return *address;
@@ -165,7 +166,8 @@ std::vector<Listener> adoptListeners(int count) {
     if (rc != 0 || listens == 0) throw std::runtime_error(name + " does not listen");
     const sockaddr_storage address = nameOf(descriptor);
     if (!isLoopback(address)) {
-      throw std::runtime_error(name + " listens elsewhere than on a loopback address, and this server does not ask who "
+      throw std::runtime_error(name +
+                               " listens elsewhere than on a loopback address, and this server does not ask who "
                                "its clients are");
     }
     ::fcntl(descriptor, F_SETFD, FD_CLOEXEC);

@@ -32,9 +32,10 @@ void logBrokerLine(broker::LogLevel level, std::string_view text) noexcept;
 /// Takes the lines about requests, which clients can bring about.
 void logServiceLine(broker::LogLevel level, std::string_view text) noexcept;
 
-#define ZORVA_LOG(level, text) \
-  ::zorva::server::logLine(::zorva::server::Level::level, (text), static_cast<const char*>(__func__), __FILE__, __LINE__)
-#define ZORVA_LOG_CLIENT(level, text)                                                                             \
+#define ZORVA_LOG(level, text)                                                                                  \
+  ::zorva::server::logLine(::zorva::server::Level::level, (text), static_cast<const char*>(__func__), __FILE__, \
+                           __LINE__)
+#define ZORVA_LOG_CLIENT(level, text)                                                                                 \
   ::zorva::server::logClientLine(::zorva::server::Level::level, (text), static_cast<const char*>(__func__), __FILE__, \
                                  __LINE__)
 

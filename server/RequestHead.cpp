@@ -44,9 +44,7 @@ bool isTokenCharacter(char c) {
   return letter || (c >= '0' && c <= '9') || std::string_view("!#$%&'*+-.^_`|~").find(c) != std::string_view::npos;
 }
 
-bool isToken(std::string_view text) {
-  return !text.empty() && std::all_of(text.begin(), text.end(), isTokenCharacter);
-}
+bool isToken(std::string_view text) { return !text.empty() && std::all_of(text.begin(), text.end(), isTokenCharacter); }
 
 bool isFieldText(std::string_view text) {
   return std::none_of(text.begin(), text.end(),
@@ -63,8 +61,8 @@ std::string_view withoutPrefix(std::string_view name) {
 
 /// Names of which a request has one at most: what decides how it is read, and what CIM puts there.
 bool isSingle(std::string_view name) {
-  constexpr std::string_view kSingle[] = {"Host",        "Content-Length", "Transfer-Encoding", "Content-Type",
-                                          "Man",         "Authorization",  "Content-Encoding"};
+  constexpr std::string_view kSingle[] = {"Host", "Content-Length", "Transfer-Encoding", "Content-Type",
+                                          "Man",  "Authorization",  "Content-Encoding"};
   return std::any_of(std::begin(kSingle), std::end(kSingle), [&](auto each) { return equalNames(each, name); }) ||
          equalNames(name.substr(0, 3), "CIM");
 }

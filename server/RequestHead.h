@@ -22,7 +22,7 @@ struct RequestHead {
 /// An answer that needs no CIM.
 struct Refusal {
   int status = 400;
-  std::string why;           ///< a sentence for the person at the other end and for the log
+  std::string why;            ///< a sentence for the person at the other end and for the log
   std::string_view cimError;  ///< value of the header CIMError (DSP0200 7.3.3); empty: none
 };
 

@@ -11,14 +11,13 @@ using ::testing::HasSubstr;
 constexpr std::size_t kMost = 1000;
 
 HeaderList usual() {
-  return {{"Host", "localhost"},          {"Content-Type", "application/xml; charset=\"utf-8\""},
-          {"Content-Length", "10"},       {"CIMOperation", "MethodCall"},
-          {"CIMMethod", "GetInstance"},   {"CIMObject", "root/cimv2"}};
+  return {{"Host", "localhost"},        {"Content-Type", "application/xml; charset=\"utf-8\""},
+          {"Content-Length", "10"},     {"CIMOperation", "MethodCall"},
+          {"CIMMethod", "GetInstance"}, {"CIMObject", "root/cimv2"}};
 }
 
 /// The usual request with further fields behind its own, or in the place of those of the same name.
-std::optional<Refusal> check(HeaderList more, std::string_view method = "POST",
-                             std::string_view version = "HTTP/1.1") {
+std::optional<Refusal> check(HeaderList more, std::string_view method = "POST", std::string_view version = "HTTP/1.1") {
   HeaderList headers = usual();
   headers.insert(headers.end(), more.begin(), more.end());
   return checkHead({method, version, headers}, kMost);
@@ -67,9 +66,9 @@ TEST(RequestHead, OtherCodingsThanChunkedAreRefused) {
   for (const char* coding : {"gzip, chunked", "chunked, chunked", "identity", "xchunked", "chunked;q=1", ""}) {
     EXPECT_EQ(statusOf(checkWithout("Content-Length", {{"Transfer-Encoding", coding}})), 400) << coding;
   }
-  EXPECT_EQ(statusOf(checkWithout("Content-Length",
-                                  {{"Transfer-Encoding", "chunked"}, {"Transfer-Encoding", "chunked"}})),
-            400);
+  EXPECT_EQ(
+      statusOf(checkWithout("Content-Length", {{"Transfer-Encoding", "chunked"}, {"Transfer-Encoding", "chunked"}})),
+      400);
 }
 
 TEST(RequestHead, ChunksBelongToHttp11) {

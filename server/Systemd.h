@@ -2,8 +2,8 @@
 
 #include <string_view>
 
-// What a service manager and this process tell each other: the protocols of sd_notify(3) and sd_listen_fds(3), which are
-// a datagram and two environment variables. Their library would bring five others into every start.
+// What a service manager and this process tell each other: the protocols of sd_notify(3) and sd_listen_fds(3), which
+// are a datagram and two environment variables. Their library would bring five others into every start.
 
 namespace zorva::server {
 

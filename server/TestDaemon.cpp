@@ -120,8 +120,9 @@ bool TestDaemon::logs(const std::string& text) const {
 }
 
 void TestDaemon::writeConfig(const std::string& config) const {
-  directory_.write("zorvacimd.toml", "[agent]\nconfig = \"agent.toml\"\nprovider_dir = \"" + std::string(ZORVA_LIB_DIR) +
-                                         "\"\n[log]\ntarget = \"log\"\nlevel = 4500\n" + config);
+  directory_.write("zorvacimd.toml", "[agent]\nconfig = \"agent.toml\"\nprovider_dir = \"" +
+                                         std::string(ZORVA_LIB_DIR) + "\"\n[log]\ntarget = \"log\"\nlevel = 4500\n" +
+                                         config);
 }
 
 DaemonOutcome TestDaemon::run(const std::vector<std::string>& arguments) {

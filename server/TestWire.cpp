@@ -161,14 +161,14 @@ std::string posting(std::string_view body, std::string_view fields) {
 
 std::string enumeration(std::string_view operation, std::string_view className, std::string_view fields) {
   const std::string name(operation);
-  return posting("<?xml version=\"1.0\" encoding=\"utf-8\"?><CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.0\">"
-                 "<MESSAGE ID=\"1\" PROTOCOLVERSION=\"1.0\"><SIMPLEREQ><IMETHODCALL NAME=\"" +
-                     name +
-                     "\"><LOCALNAMESPACEPATH><NAMESPACE NAME=\"root\"/><NAMESPACE NAME=\"cimv2\"/></LOCALNAMESPACEPATH>"
-                     "<IPARAMVALUE NAME=\"ClassName\"><CLASSNAME NAME=\"" +
-                     std::string(className) + "\"/></IPARAMVALUE></IMETHODCALL></SIMPLEREQ></MESSAGE></CIM>",
-                 "CIMOperation: MethodCall\r\nCIMMethod: " + name + "\r\nCIMObject: root/cimv2\r\n" +
-                     std::string(fields));
+  return posting(
+      "<?xml version=\"1.0\" encoding=\"utf-8\"?><CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.0\">"
+      "<MESSAGE ID=\"1\" PROTOCOLVERSION=\"1.0\"><SIMPLEREQ><IMETHODCALL NAME=\"" +
+          name +
+          "\"><LOCALNAMESPACEPATH><NAMESPACE NAME=\"root\"/><NAMESPACE NAME=\"cimv2\"/></LOCALNAMESPACEPATH>"
+          "<IPARAMVALUE NAME=\"ClassName\"><CLASSNAME NAME=\"" +
+          std::string(className) + "\"/></IPARAMVALUE></IMETHODCALL></SIMPLEREQ></MESSAGE></CIM>",
+      "CIMOperation: MethodCall\r\nCIMMethod: " + name + "\r\nCIMObject: root/cimv2\r\n" + std::string(fields));
 }
 
 std::string gunzipped(const std::string& text) {

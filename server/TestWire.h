@@ -23,7 +23,8 @@ struct WireResponse {
 
 class Wire {
  public:
-  /// Connects to 127.0.0.1; a receive buffer of that size, where one is given, makes a client that takes little at once.
+  /// Connects to 127.0.0.1; a receive buffer of that size, where one is given, makes a client that takes little at
+  /// once.
   explicit Wire(int port, int receiveBuffer = 0);
 
   /// False: the other side is gone.

@@ -74,10 +74,10 @@ class Workers::Core : public WaitListener, public std::enable_shared_from_this<C
   std::deque<std::shared_ptr<HttpExchange>> queue_;
   std::vector<std::shared_ptr<HttpExchange>> inFlight_;  ///< those of queue_ too
   std::size_t threads_ = 0;
-  std::size_t idle_ = 0;    ///< threads that wait for work
+  std::size_t idle_ = 0;  ///< threads that wait for work
   /// Requests that run and do not wait for their client. Below 0 for the moment in which one that waits is given up.
   std::ptrdiff_t active_ = 0;
-  std::size_t stuck_ = 0;   ///< threads whose request was given up
+  std::size_t stuck_ = 0;  ///< threads whose request was given up
   bool stopping_ = false;
 };
 
@@ -139,9 +139,8 @@ void Workers::Core::run() {
   bool goesOn = true;
   while (goesOn) {
     ++idle_;
-    const bool ready = work_ready_.wait_for(lock, kIdleThread, [this] {
-      return stopping_ || (!queue_.empty() && active_ < mostActive());
-    });
+    const bool ready = work_ready_.wait_for(
+        lock, kIdleThread, [this] { return stopping_ || (!queue_.empty() && active_ < mostActive()); });
     --idle_;
     if (!ready || queue_.empty()) break;
     goesOn = answer(lock);

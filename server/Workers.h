@@ -32,8 +32,8 @@ class Workers {
 
   void setLimits(const HttpLimits& limits);
 
-  /// Takes a request on, whose connection is suspended; or tells why not, and then leaves it alone. Where all places are
-  /// taken, a client that has let its response wait for longest gives way to `exchange`.
+  /// Takes a request on, whose connection is suspended; or tells why not, and then leaves it alone. Where all places
+  /// are taken, a client that has let its response wait for longest gives way to `exchange`.
   std::optional<Refusal> submit(const std::shared_ptr<HttpExchange>& exchange, Connections& connections);
 
   /// Gives up the requests whose time is over.

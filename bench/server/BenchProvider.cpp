@@ -1,6 +1,6 @@
 // A provider whose own work is next to nothing, so that what the server and its broker add is what is measured: each
 // instance has fifteen properties, four of them keys, of the kinds that a protocol endpoint has.
-#include <cstdio>
+#include <charconv>
 #include <cstring>
 
 #include "cmpidt.h"
@@ -62,13 +62,10 @@ void setNumbers(CMPIInstance* instance, int number) {
 }
 
 CMPIInstance* instanceOf(const CMPIObjectPath* like, int number) {
-  char name[32];
-  std::snprintf(name, sizeof name, "eth%d", number);
+  char name[32] = "eth";
+  std::to_chars(name + 3, name + sizeof name - 1, number);
+  // The keys come with the path.
   CMPIInstance* instance = broker->eft->newInstance(broker, pathOf(like, name), nullptr);
-  for (const Text& each : kKeys) {
-    instance->ft->setProperty(instance, each.name, reinterpret_cast<const CMPIValue*>(each.value), CMPI_chars);
-  }
-  instance->ft->setProperty(instance, "Name", reinterpret_cast<const CMPIValue*>(name), CMPI_chars);
   for (const Text& each : kTexts) {
     instance->ft->setProperty(instance, each.name, reinterpret_cast<const CMPIValue*>(each.value), CMPI_chars);
   }
@@ -86,9 +83,9 @@ CMPIStatus cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) { return kO
 
 CMPIStatus names(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result, const CMPIObjectPath* path) {
   const int count = countOf(nameOf(path));
-  char name[32];
   for (int i = 0; i < count; ++i) {
-    std::snprintf(name, sizeof name, "eth%d", i);
+    char name[32] = "eth";
+    std::to_chars(name + 3, name + sizeof name - 1, i);
     result->ft->returnObjectPath(result, pathOf(path, name));
   }
   result->ft->returnDone(result);
@@ -118,8 +115,8 @@ CMPIInstanceMIFT table = {CMPICurrentVersion,
 }  // namespace
 
 CMPI_EXTERN_C __attribute__((visibility("default"))) CMPIInstanceMI* Bench_Create_InstanceMI(const CMPIBroker* mb,
-                                                                                               const CMPIContext*,
-                                                                                               CMPIStatus*) {
+                                                                                             const CMPIContext*,
+                                                                                             CMPIStatus*) {
   static CMPIInstanceMI mi = {nullptr, &table};
   broker = mb;
   return &mi;

@@ -40,9 +40,9 @@ int main(int argc, char** argv) {
   sockaddr_in address{};
   address.sin_family = AF_INET;
   address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-  MHD_Daemon* daemon = MHD_start_daemon(                                                          //
+  MHD_Daemon* daemon = MHD_start_daemon(                                                             //
       MHD_USE_EPOLL_INTERNAL_THREAD | MHD_USE_ERROR_LOG, 0, nullptr, nullptr, &onRequest, response,  //
-      MHD_OPTION_SOCK_ADDR, reinterpret_cast<sockaddr*>(&address),                                //
+      MHD_OPTION_SOCK_ADDR, reinterpret_cast<sockaddr*>(&address),                                   //
       MHD_OPTION_THREAD_POOL_SIZE, static_cast<unsigned>(std::atoi(argv[2])), MHD_OPTION_END);
   if (daemon == nullptr) return 1;
   std::printf("%u\n", MHD_get_daemon_info(daemon, MHD_DAEMON_INFO_BIND_PORT)->port);

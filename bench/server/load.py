@@ -5,7 +5,8 @@
 
 Throughput is a ratio: requests per second of the server over those of a ceiling, the same bytes served from memory by
 the same HTTP library in the same threading mode. Both are measured by wrk in turns, and the best turn of each counts:
-what else a machine does only takes away, and takes most from who has several threads. NAME picks the figures whose name holds it. Exits 1 where a figure falls short.
+what else a machine does only takes away, and takes most from who has several threads. NAME picks the figures: few,
+many, start, memory, endpoints. Exits 1 where a figure falls short.
 """
 
 import argparse
@@ -220,7 +221,8 @@ def memory(build):
         time.sleep(2)
         after = resident_mb(process.pid)
     return [Figure("resident memory idle, MB", idle, 15, False, f"{idle:.1f} MB"),
-            Figure("resident memory after 10,000 instances, MB", after, 30, False, f"{after:.1f} MB, {peak:.1f} at most")]
+            Figure("resident memory after 10,000 instances, MB", after, 30, False,
+                   f"{after:.1f} MB, {peak:.1f} at most")]
 
 
 def main():
