@@ -23,7 +23,8 @@ std::size_t bucketOf(std::string_view name, std::size_t mask) noexcept {
 
 }  // namespace
 
-ClassInfo::ClassInfo(const schema::Class& declared) : declared_(declared), nameObject_(nullptr, declared.name()) {
+ClassInfo::ClassInfo(const schema::Class& declared)
+    : declared_(declared), nameObject_(nullptr, declared.name()), successors_(declared.properties().size() + 1) {
   const auto& all = declared.properties();
   properties_.reserve(all.size());
   std::size_t size = 4;
@@ -53,6 +54,17 @@ const PropertyInfo* ClassInfo::find(std::string_view name) const noexcept {
     if (known == name || schema::sameName(known, name)) return &property;
   }
   return nullptr;
+}
+
+const PropertyInfo* ClassInfo::findAfter(const PropertyInfo* previous, const char* name) const noexcept {
+  std::atomic<std::uint16_t>& successor = successors_[previous != nullptr ? previous->index + 1U : 0];
+  if (const std::uint16_t usual = successor.load(std::memory_order_relaxed); usual != 0) {
+    const PropertyInfo& property = properties_[usual - 1U];
+    if (property.declared->name == name) return &property;
+  }
+  const PropertyInfo* found = find(name);
+  if (found != nullptr) successor.store(static_cast<std::uint16_t>(found->index + 1), std::memory_order_relaxed);
+  return found;
 }
 
 ClassTable::ClassTable(std::shared_ptr<const schema::ClassRepository> repository)

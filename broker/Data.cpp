@@ -241,6 +241,7 @@ InstanceObject* copyInstance(Arena& arena, const InstanceObject& instance) {
   copy->host = copyName(arena, *instance.host);
   copy->slots = arena.makeArray<InstanceObject::Slot>(instance.count);
   copy->count = instance.count;
+  copy->present = instance.present;
   copy->capacity = instance.count;
   for (std::uint32_t i = 0; i < instance.count; ++i) {
     copy->slots[i] = {instance.slots[i].property, copyData(arena, instance.slots[i].data)};

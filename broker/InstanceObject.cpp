@@ -46,7 +46,8 @@ CMPICount getPropertyCount(const CMPIInstance* handle, CMPIStatus* status) {
 CMPIStatus setProperty(const CMPIInstance* handle, const char* name, const CMPIValue* value, CMPIType type) {
   InstanceObject* self = own<InstanceObject>(handle);
   if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
-  const PropertyInfo* property = name != nullptr ? self->info->find(name) : nullptr;
+  const PropertyInfo* previous = self->count > 0 ? self->slots[self->count - 1].property : nullptr;
+  const PropertyInfo* property = name != nullptr ? self->info->findAfter(previous, name) : nullptr;
   if (property == nullptr) {
     return statusOf(CMPI_RC_ERR_NO_SUCH_PROPERTY,
                     self->info->name() + " has no property " + (name != nullptr ? name : "without a name"));
@@ -137,15 +138,22 @@ InstanceObject* InstanceObject::make(Arena& arena, const PathObject& path) {
     copyEntries(arena, path.keys, *keys);
     instance->looseKeys = keys;
   }
-  for (const EntryList::Entry& key : path.keys) {
-    if (const PropertyInfo* property = path.info->find(key.name->view())) {
-      instance->set(*property, copyData(arena, key.data));
+  for (std::uint32_t i = 0; i < path.keys.size(); ++i) {
+    if (const PropertyInfo* property = path.info->findKey(i, path.keys[i].name->view())) {
+      instance->set(*property, copyData(arena, path.keys[i].data));
     }
   }
   return instance;
 }
 
+namespace {
+
+std::uint64_t bitOf(const PropertyInfo& property) noexcept { return std::uint64_t{1} << (property.index % 64); }
+
+}  // namespace
+
 const InstanceObject::Slot* InstanceObject::find(const PropertyInfo& property) const noexcept {
+  if ((present & bitOf(property)) == 0) return nullptr;
   const Slot* found = std::find_if(slots, slots + count, [&](const Slot& slot) { return slot.property == &property; });
   return found != slots + count ? found : nullptr;
 }
@@ -162,6 +170,7 @@ void InstanceObject::set(const PropertyInfo& property, const CMPIData& data) {
     slots = more;
     capacity = grown;
   }
+  present |= bitOf(property);
   Slot& slot = slots[count++];
   slot.property = &property;
   slot.data.type = data.type;

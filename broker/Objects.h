@@ -188,6 +188,7 @@ struct InstanceObject : CMPIInstance {
   Slot* slots = nullptr;
   std::uint32_t count = 0;
   std::uint32_t capacity = 0;
+  std::uint64_t present = 0;             ///< a bit for those that are set, by their index modulo 64
   std::uint64_t* filter = nullptr;       ///< a bit for each property that may be set; null: all
   const EntryList* looseKeys = nullptr;  ///< of a class without key properties: those of the path it was made from
 };

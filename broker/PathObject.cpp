@@ -60,7 +60,7 @@ CMPIStatus addKey(CMPIObjectPath* handle, const char* name, const CMPIValue* val
   const CMPIrc rc = importData(*self->arena, value, type, data);
   if (rc != CMPI_RC_OK) return {rc, nullptr};
   // A key that the class lacks is kept: what it is good for is for those to judge who are given the path.
-  const PropertyInfo* known = self->info != nullptr ? self->info->find(name) : nullptr;
+  const PropertyInfo* known = self->info != nullptr ? self->info->findKey(self->keys.size(), name) : nullptr;
   if (known != nullptr && fitData(*known, data) != CMPI_RC_OK) {
     return statusOf(CMPI_RC_ERR_TYPE_MISMATCH, std::string(name) + " is declared with another type");
   }

@@ -5,6 +5,7 @@
 #include <charconv>
 #include <cmath>
 #include <cstdint>
+#include <cstring>
 
 #include "cimxml/ClassWriter.h"
 #include "schema/Utf8.h"
@@ -51,6 +52,26 @@ std::string_view standIn(char character) noexcept {
     default:
       return kReplacement;
   }
+}
+
+/// How many bytes at the beginning of `text` are surely plain, in whole words of eight: most texts are nothing else.
+std::size_t plainWords(std::string_view text) noexcept {
+  using Word = std::uint64_t;
+  constexpr Word kOnes = 0x0101010101010101;
+  constexpr Word kHighs = 0x8080808080808080;
+  // Sets the high bit of each byte that is 0. Borrows may set others, but only in a word that has such a byte.
+  const auto zeros = [](Word word) { return (word - kOnes) & ~word; };
+  std::size_t done = 0;
+  for (; text.size() - done >= sizeof(Word); done += sizeof(Word)) {
+    Word word = 0;
+    std::memcpy(&word, text.data() + done, sizeof word);
+    const Word low = word - kOnes * 0x20;     // borrows from below 0x20
+    const Word high = word | (word + kOnes);  // 0x7F and above
+    const Word special =
+        zeros(word ^ kOnes * '&') | zeros(word ^ kOnes * '<') | zeros(word ^ kOnes * '>') | zeros(word ^ kOnes * '"');
+    if (((low | high | special) & kHighs) != 0) break;
+  }
+  return done;
 }
 
 void appendUtf16Unit(std::string& out, char16_t unit) {
@@ -119,16 +140,17 @@ const char* keyValueType(schema::Type type) noexcept {
 }
 
 void appendKeyBinding(std::string& out, const broker::NamedValue& key) {
-  out += "<KEYBINDING";
-  appendAttribute(out, "NAME", key.name);
-  out += '>';
+  out += "<KEYBINDING NAME=\"";
+  appendEscaped(out, key.name);
+  out += "\">";
   if (key.value.type == schema::Type::Reference) {
     appendValue(out, key.value);
   } else {
-    out += "<KEYVALUE";
-    appendAttribute(out, "VALUETYPE", keyValueType(key.value.type));
-    appendAttribute(out, "TYPE", schema::typeName(key.value.type));
-    out += '>';
+    out += "<KEYVALUE VALUETYPE=\"";
+    out += keyValueType(key.value.type);
+    out += "\" TYPE=\"";
+    out += schema::typeName(key.value.type);
+    out += "\">";
     std::visit(ContentWriter(out), key.value.scalar);
     out += "</KEYVALUE>";
   }
@@ -152,9 +174,13 @@ void appendProperty(std::string& out, const broker::Property& property, const br
   const char* const element = propertyElement(property.value);
   out += '<';
   out += element;
-  appendAttribute(out, "NAME", property.name);
+  out += " NAME=\"";
+  appendEscaped(out, property.name);
+  out += '"';
   if (property.value.type != schema::Type::Reference) {
-    appendAttribute(out, "TYPE", schema::typeName(property.value.type));
+    out += " TYPE=\"";
+    out += schema::typeName(property.value.type);
+    out += '"';
   } else if (property.declaration != nullptr) {
     appendAttribute(out, "REFERENCECLASS", property.declaration->referenceClass);
   }
@@ -186,7 +212,7 @@ void appendAttribute(std::string& out, std::string_view name, std::string_view v
 void appendEscaped(std::string& out, std::string_view text) {
   // Nearly all text is plain: it is copied in runs, and only what ends a run is looked at by itself.
   std::size_t begin = 0;
-  std::size_t i = 0;
+  std::size_t i = plainWords(text);
   while (i < text.size()) {
     const auto byte = static_cast<unsigned char>(text[i]);
     if (kPlain[byte]) {

@@ -62,6 +62,19 @@ TEST(XmlText, LeavesOtherCharactersAsTheyAre) {
   EXPECT_EQ(escaped("r\xC3\xA9seau \xF0\x9F\x8C\x90"), "r\xC3\xA9seau \xF0\x9F\x8C\x90");
 }
 
+// Long texts are looked at in words: each byte must be seen at each place in one.
+TEST(XmlText, TreatsAByteAlikeWhereverItStands) {
+  const auto alone = [](int byte) { return escaped(std::string(1, static_cast<char>(byte))); };
+  for (int byte = 0; byte < 256; ++byte) {
+    for (std::size_t before = 0; before < 17; ++before) {
+      const std::string left(before, 'a');
+      const std::string right(16 - before, '~');
+      ASSERT_EQ(escaped(left + static_cast<char>(byte) + right), left + alone(byte) + right)
+          << byte << " at " << before;
+    }
+  }
+}
+
 TEST(XmlValue, IsNothingWhereItIsNull) { EXPECT_EQ(elementOf(Value::null(schema::Type::String)), ""); }
 
 TEST(XmlValue, HasOneElementForEachElementOfAnArray) {

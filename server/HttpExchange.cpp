@@ -1,7 +1,5 @@
 #include "server/HttpExchange.h"
 
-#include <sched.h>
-
 #include <algorithm>
 #include <utility>
 
@@ -206,16 +204,10 @@ bool HttpExchange::giveUp(const std::function<void(ResponseSink&)>& answer) {
 
 // ---- The event thread ----
 
-// A response is mostly there sooner than the connection could be taken out of the event loop and put back into it, and
-// sooner than a sleeping thread wakes up. Others have the processor meanwhile.
-bool HttpExchange::awaitOrSuspend(std::chrono::microseconds moment) {
-  const auto deadline = Clock::now() + moment;
-  while (moment.count() > 0 && !published_.load(std::memory_order_acquire) && Clock::now() < deadline) ::sched_yield();
+void HttpExchange::suspend() {
   const std::lock_guard lock(mutex_);
-  if (published_) return true;
   suspended_ = true;
   MHD_suspend_connection(connection_);
-  return false;
 }
 
 bool HttpExchange::isPublished() const { return published_.load(std::memory_order_acquire); }

@@ -53,9 +53,8 @@ class HttpExchange final : public ResponseSink {
 
   // ---- The event thread ----
 
-  /// Waits a moment for the response; where it is not there by then, lets the connection rest until it is. False: it
-  /// rests.
-  bool awaitOrSuspend(std::chrono::microseconds moment);
+  /// Lets the connection rest until there is a response. Before the work may begin: then neither waits for the other.
+  void suspend();
 
   /// Whether respond() may be called: there is a response, or its beginning.
   bool isPublished() const;

@@ -34,33 +34,6 @@ std::shared_ptr<Connection> connectionOf(MHD_Connection* connection) {
   return *static_cast<std::shared_ptr<Connection>*>(info->socket_context);
 }
 
-/// How long an event thread waits for a response before it turns to its other connections. Where that was in vain, the
-/// next requests are not waited for: slow providers cost the other clients of the thread next to nothing.
-class Patience {
- public:
-  /// Calls `wait` with the time to wait; it tells whether the response came.
-  template <class Wait>
-  bool lets(Wait wait) {
-    constexpr std::chrono::microseconds kMoment{150};
-    constexpr int kRest = 32;
-    if (rest_ > 0) {
-      --rest_;
-      return wait(std::chrono::microseconds(0));
-    }
-    if (wait(kMoment)) return true;
-    rest_ = kRest;
-    return false;
-  }
-
- private:
-  int rest_ = 0;
-};
-
-Patience& patience() {
-  static thread_local Patience own;
-  return own;
-}
-
 std::string withoutLineEnd(std::string text) {
   while (!text.empty() && (text.back() == '\n' || text.back() == '\r')) text.pop_back();
   return text;
@@ -294,13 +267,13 @@ MHD_Result HttpServer::Core::requestIsWhole(const Holder& exchange) {
     return exchange->respond();
   }
   exchange->client->enter(Phase::Working);
+  exchange->suspend();
   if (!exchange->refusal.has_value()) exchange->refusal = workers_.submit(exchange, connections_);
   if (exchange->refusal.has_value()) {
     logRefusal(*exchange, *exchange->refusal);
     exchange->finish(*exchange->refusal);
-    return exchange->respond();
   }
-  return patience().lets([&](auto moment) { return exchange->awaitOrSuspend(moment); }) ? exchange->respond() : MHD_YES;
+  return MHD_YES;
 }
 
 void HttpServer::Core::onCompleted(void* self, MHD_Connection*, void** holder, MHD_RequestTerminationCode code) {

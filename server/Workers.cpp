@@ -7,6 +7,7 @@
 #include <exception>
 #include <iterator>
 #include <mutex>
+#include <semaphore>
 #include <system_error>
 #include <thread>
 #include <utility>
@@ -36,6 +37,8 @@ std::string nameOf(const HttpExchange& exchange) {
 }  // namespace
 
 /// Outlives the Workers for as long as a thread is stuck.
+using Sleeper = std::binary_semaphore;
+
 class Workers::Core : public WaitListener, public std::enable_shared_from_this<Core> {
  public:
   Core(const HttpLimits& limits, Work work, LateAnswer lateAnswer)
@@ -63,10 +66,13 @@ class Workers::Core : public WaitListener, public std::enable_shared_from_this<C
   void run();
   bool answer(std::unique_lock<std::mutex>& lock);
   void forget(HttpExchange& exchange);
+  bool sleep(std::unique_lock<std::mutex>& lock);
+  Sleeper* nextSleeper();
+  void wakeOne();
   std::ptrdiff_t mostActive() const { return static_cast<std::ptrdiff_t>(limits_.workers); }
 
   mutable std::mutex mutex_;
-  std::condition_variable work_ready_;
+  std::vector<Sleeper*> sleepers_;  ///< the last one went to sleep last, and has the warmest cache
   std::condition_variable thread_ended_;
   HttpLimits limits_;
   const Work work_;
@@ -100,8 +106,9 @@ std::optional<Refusal> Workers::Core::submit(const std::shared_ptr<HttpExchange>
   exchange->place = inFlight_.size();
   inFlight_.push_back(exchange);
   queue_.push_back(exchange);
+  Sleeper* const woken = nextSleeper();
   lock.unlock();
-  work_ready_.notify_one();
+  if (woken != nullptr) woken->release();
   return std::nullopt;
 }
 
@@ -138,15 +145,42 @@ void Workers::Core::run() {
   std::unique_lock lock(mutex_);
   bool goesOn = true;
   while (goesOn) {
-    ++idle_;
-    const bool ready = work_ready_.wait_for(
-        lock, kIdleThread, [this] { return stopping_ || (!queue_.empty() && active_ < mostActive()); });
-    --idle_;
-    if (!ready || queue_.empty()) break;
-    goesOn = answer(lock);
+    if (!queue_.empty() && active_ < mostActive()) {
+      goesOn = answer(lock);
+    } else if (stopping_ || !sleep(lock)) {
+      break;
+    }
   }
   --threads_;
   thread_ended_.notify_all();
+}
+
+/// False: there was nothing to do for so long that the thread should end.
+bool Workers::Core::sleep(std::unique_lock<std::mutex>& lock) {
+  Sleeper self(0);
+  sleepers_.push_back(&self);
+  ++idle_;
+  lock.unlock();
+  bool woken = self.try_acquire_for(kIdleThread);
+  lock.lock();
+  if (!woken && std::erase(sleepers_, &self) == 0) {
+    self.acquire();  // it is being woken just now
+    woken = true;
+  }
+  --idle_;
+  return woken;
+}
+
+/// The thread to wake: it stays asleep until it is.
+Sleeper* Workers::Core::nextSleeper() {
+  if (sleepers_.empty()) return nullptr;
+  Sleeper* const next = sleepers_.back();
+  sleepers_.pop_back();
+  return next;
+}
+
+void Workers::Core::wakeOne() {
+  if (Sleeper* const next = nextSleeper()) next->release();
 }
 
 /// Answers the next request. False: the request was given up meanwhile, and another thread has this one's place.
@@ -199,7 +233,7 @@ void Workers::Core::waitsForClient() {
   --active_;
   if (queue_.empty()) return;
   if (idle_ > 0) {
-    work_ready_.notify_one();
+    wakeOne();
   } else {
     startThread();
   }
@@ -250,14 +284,15 @@ void Workers::Core::giveUp(const std::shared_ptr<HttpExchange>& exchange, const 
   }
   --active_;
   ++stuck_;
-  if (!queue_.empty() && idle_ == 0) startThread();
-  work_ready_.notify_one();
+  if (queue_.empty()) return;
+  if (idle_ == 0) startThread();
+  wakeOne();
 }
 
 void Workers::Core::stop() {
   const std::lock_guard lock(mutex_);
   stopping_ = true;
-  work_ready_.notify_all();
+  while (!sleepers_.empty()) wakeOne();
 }
 
 bool Workers::Core::join(std::chrono::milliseconds most) {

@@ -4,9 +4,11 @@
   bench/server/load.py --build build/bench [NAME...]
 
 Throughput is a ratio: requests per second of the server over those of a ceiling, the same bytes served from memory by
-the same HTTP library in the same threading mode. Both are measured by wrk in turns, and the best turn of each counts:
-what else a machine does only takes away, and takes most from who has several threads. NAME picks the figures: few,
-many, start, memory, endpoints. Exits 1 where a figure falls short.
+the same HTTP library in the same threading mode: event threads that hand each request to another thread and get it
+back. Beside it stands the ratio to a ceiling whose event threads answer by themselves, which a server of providers
+cannot do: one that hangs would hang all connections of its thread. All are measured by wrk in turns, and the best turn
+of each counts: what else a machine does only takes away, and takes most from who has several threads. NAME picks the
+figures: few, many, start, memory, endpoints. Exits 1 where a figure falls short.
 """
 
 import argparse
@@ -81,12 +83,12 @@ def server(build, program, interfaces=None):
 
 
 @contextlib.contextmanager
-def ceiling(build, body):
-    """Serves the bytes from memory; gives the port."""
+def ceiling(build, body, way="handover"):
+    """Serves the bytes from memory, with a hand-over between threads or directly; gives the port."""
     with tempfile.NamedTemporaryFile() as file:
         file.write(body)
         file.flush()
-        process = subprocess.Popen([os.path.join(build, "bin", "server_ceiling"), file.name, str(THREADS)],
+        process = subprocess.Popen([os.path.join(build, "bin", "server_ceiling"), file.name, str(THREADS), way],
                                    stdin=subprocess.PIPE, stdout=subprocess.PIPE, text=True)
         try:
             yield int(process.stdout.readline())
@@ -130,18 +132,26 @@ def load(port, class_name, connections, seconds=SECONDS):
 
 def throughput(build, class_name, limit, tail_limit):
     figures = []
-    with server(build, "server_bench") as (_, port), ceiling(build, ask(port, class_name)) as best:
+    with contextlib.ExitStack() as stack:
+        _, port = stack.enter_context(server(build, "server_bench"))
+        body = ask(port, class_name)
+        best = stack.enter_context(ceiling(build, body))
+        direct = stack.enter_context(ceiling(build, body, "direct"))
         count = {"Bench_Few": "4 instances", "Bench_Many": "1,000 instances"}[class_name]
         for connections in (1, 8):
-            runs, best_runs = [], []
+            runs, best_runs, direct_runs = [], [], []
             for _ in range(TURNS):
                 best_runs.append(load(best, class_name, connections)[0])
                 runs.append(load(port, class_name, connections))
+                direct_runs.append(load(direct, class_name, connections)[0])
             rate = max(run[0] for run in runs)
             top = max(best_runs)
+            direct_top = max(direct_runs)
             name = f"{count}, {connections} connection{'s' if connections > 1 else ''}"
             figures.append(Figure(f"{name}: requests/s, to the ceiling's", rate / top, limit, True,
                                   f"{rate:.0f} / {top:.0f} a second"))
+            figures.append(Figure(f"{name}: the same, to a ceiling without hand-over", rate / direct_top, None, True,
+                                  f"{rate:.0f} / {direct_top:.0f} a second"))
             if connections == 1:
                 _, half, most = min(runs, key=lambda run: run[2] / run[1])
                 figures.append(Figure(f"{name}: p99, to p50", most / half, tail_limit, False,
