@@ -1,6 +1,8 @@
 #include "broker/ProviderRegistry.h"
 
 #include <algorithm>
+#include <filesystem>
+#include <system_error>
 #include <utility>
 
 #include "schema/Names.h"
@@ -51,6 +53,17 @@ ProviderRegistry ProviderRegistry::builtIn() {
   ProviderRegistry registry;
   for (const BuiltIn& row : kBuiltIn) registry.add({row.className, row.prefix, row.library, row.kinds});
   return registry;
+}
+
+std::string ProviderRegistry::builtInDirectory() {
+  const std::string library = std::string("lib") + kProfileLibrary + ".so.1";
+  std::error_code ignored;
+  const std::filesystem::path program = std::filesystem::read_symlink("/proc/self/exe", ignored);
+  for (const char* libraries : {"lib", ZORVA_INSTALL_LIBDIR}) {
+    const std::filesystem::path directory = program.parent_path().parent_path() / libraries;
+    if (std::filesystem::exists(directory / library, ignored)) return directory.string();
+  }
+  return {};
 }
 
 void ProviderRegistry::add(ProviderEntry entry) {

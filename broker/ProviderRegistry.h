@@ -30,6 +30,10 @@ class ProviderRegistry {
   /// The twelve classes of the DNS client profile and the four companions.
   static ProviderRegistry builtIn();
 
+  /// The directory with the libraries of builtIn(): beside the running program, as built or as installed. Empty where
+  /// they are not there, which leaves it to the dynamic loader.
+  static std::string builtInDirectory();
+
   /// Adds an entry; one for a class and namespace that is there already takes its place.
   void add(ProviderEntry entry);
 

@@ -6,7 +6,6 @@
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
-#include <filesystem>
 #include <vector>
 
 #include "agent/Agent.h"
@@ -20,20 +19,6 @@
 namespace zorva::cli {
 
 namespace {
-
-constexpr const char* kProfileLibrary = "libzorvadnsclientprofileprovider.so.1";
-
-/// Where the provider libraries lie: beside this program, as built or as installed. Empty leaves it to the dynamic
-/// loader.
-std::string defaultProviderDirectory() {
-  std::error_code ignored;
-  const std::filesystem::path program = std::filesystem::read_symlink("/proc/self/exe", ignored);
-  for (const char* libraries : {"lib", ZORVA_INSTALL_LIBDIR}) {
-    const std::filesystem::path directory = program.parent_path().parent_path() / libraries;
-    if (std::filesystem::exists(directory / kProfileLibrary, ignored)) return directory.string();
-  }
-  return {};
-}
 
 std::string similarNames(const schema::ClassRepository& classes, std::string_view name) {
   std::vector<std::string> similar;
@@ -146,7 +131,8 @@ Operations& Session::cim() {
   }
   tree();
   broker::BrokerOptions options;
-  options.providerDirectory = providerDirectory_.empty() ? defaultProviderDirectory() : providerDirectory_;
+  options.providerDirectory =
+      providerDirectory_.empty() ? broker::ProviderRegistry::builtInDirectory() : providerDirectory_;
   options.log = [this](broker::LogLevel level, std::string_view text) { log(level, text); };
   cim_ = std::make_unique<LocalOperations>(classes(), std::move(options));
   return *cim_;

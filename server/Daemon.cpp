@@ -14,7 +14,6 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
-#include <filesystem>
 #include <stdexcept>
 #include <utility>
 #include <vector>
@@ -40,19 +39,6 @@ constexpr int kSweepMilliseconds = 200;
 constexpr int kQuietMilliseconds = 10'000;
 constexpr std::chrono::milliseconds kBeforeTrim{400};
 constexpr std::chrono::milliseconds kNoDescriptors{100};
-
-constexpr const char* kProfileLibrary = "libzorvadnsclientprofileprovider.so.1";
-
-/// Beside this program, as built or as installed. Empty leaves it to the dynamic loader.
-std::string defaultProviderDirectory() {
-  std::error_code ignored;
-  const std::filesystem::path program = std::filesystem::read_symlink("/proc/self/exe", ignored);
-  for (const char* libraries : {"lib", ZORVA_INSTALL_LIBDIR}) {
-    const std::filesystem::path directory = program.parent_path().parent_path() / libraries;
-    if (std::filesystem::exists(directory / kProfileLibrary, ignored)) return directory.string();
-  }
-  return {};
-}
 
 void tellError(const std::string& text) { std::fprintf(stderr, "zorvacimd: %s\n", text.c_str()); }
 
@@ -273,7 +259,8 @@ int serve(const CommandLine& commandLine, const MakeBroker& makeBroker) {
 
 std::unique_ptr<broker::Broker> makeBuiltInBroker(const Config& config) {
   broker::BrokerOptions options;
-  options.providerDirectory = config.providerDirectory.empty() ? defaultProviderDirectory() : config.providerDirectory;
+  options.providerDirectory =
+      config.providerDirectory.empty() ? broker::ProviderRegistry::builtInDirectory() : config.providerDirectory;
   options.log = logBrokerLine;
   serveInterop(options);
   return std::make_unique<broker::Broker>(schema::loadBuiltInClasses(schema::ClassSet::Interop), std::move(options));
