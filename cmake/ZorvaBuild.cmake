@@ -13,6 +13,7 @@ set(CMAKE_VISIBILITY_INLINES_HIDDEN ON)
 set(CMAKE_LIBRARY_OUTPUT_DIRECTORY ${CMAKE_BINARY_DIR}/lib)
 set(CMAKE_RUNTIME_OUTPUT_DIRECTORY ${CMAKE_BINARY_DIR}/bin)
 set(CMAKE_BUILD_RPATH_USE_ORIGIN ON)
+include(GNUInstallDirs)
 
 find_program(ZORVA_CCACHE ccache)
 if(ZORVA_CCACHE)
@@ -58,6 +59,12 @@ function(zorva_limit_exports target file)
   target_link_options(${target} PRIVATE -Wl,--version-script=${CMAKE_CURRENT_SOURCE_DIR}/${file})
   set_property(TARGET ${target} APPEND PROPERTY LINK_DEPENDS ${CMAKE_CURRENT_SOURCE_DIR}/${file})
   target_compile_options(${target} PRIVATE $<$<CXX_COMPILER_ID:GNU>:-fno-gnu-unique>)
+endfunction()
+
+# zorva_install_library(TARGET): installs a shared library, which finds the others beside itself.
+function(zorva_install_library target)
+  set_target_properties(${target} PROPERTIES INSTALL_RPATH "$ORIGIN")
+  install(TARGETS ${target} LIBRARY NAMELINK_SKIP)
 endfunction()
 
 # zorva_add_test(NAME SOURCES files... LIBS libraries...): one GoogleTest program; each of its tests is a ctest test.

@@ -1,0 +1,16 @@
+#!/bin/sh
+# Installs a build under a folder of its own, and runs what lies there: the programs must find the libraries beside
+# them.
+#
+#   install_test.sh BUILD-FOLDER
+set -eu
+prefix=$(mktemp -d)
+trap 'rm -rf "$prefix"' EXIT
+cmake --install "$1" --prefix "$prefix" >/dev/null
+
+printf '[agent]\ndata_dir = "data/"\n[log]\ntarget = "off"\n' >"$prefix/agent.toml"
+export ZORVAGENT_CONFIG="$prefix/agent.toml"
+"$prefix/bin/zorvactl" enumerate ZORVA_ComputerSystem --output json >"$prefix/systems.json"
+grep -q '"CreationClassName": *"ZORVA_ComputerSystem"' "$prefix/systems.json"
+"$prefix/bin/zorvactl" names ZORVA_DNSGeneralSettingData >/dev/null
+"$prefix/sbin/zorvacimd" --check-config --agent-config "$prefix/agent.toml" >/dev/null
