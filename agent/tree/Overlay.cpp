@@ -1,5 +1,8 @@
 #include "agent/tree/Overlay.h"
 
+#include <unistd.h>
+
+#include <cerrno>
 #include <stdexcept>
 #include <utility>
 
@@ -102,7 +105,11 @@ void Overlay::set(const std::string& path, PropertyNumber property, const std::o
   write(values);
 }
 
+// Where nothing was ever set there is perhaps no directory either in which to lock.
+bool Overlay::isThere() const { return ::access(file_.c_str(), F_OK) == 0 || errno != ENOENT; }
+
 std::size_t Overlay::clear(const std::function<bool(const std::string& path)>& chosen) const {
+  if (!isThere()) return 0;
   const FileLock lock(directory_ + kLockName);
   OverlayValues values = read();
   const std::size_t before = countValues(values);
@@ -113,6 +120,7 @@ std::size_t Overlay::clear(const std::function<bool(const std::string& path)>& c
 }
 
 std::size_t Overlay::clearAll() const {
+  if (!isThere()) return 0;
   const FileLock lock(directory_ + kLockName);
   std::size_t cleared = 0;
   try {

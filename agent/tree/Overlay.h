@@ -48,6 +48,7 @@ class Overlay {
   std::size_t clearAll() const;
 
  private:
+  bool isThere() const;
   void write(const OverlayValues& values) const;
 
   std::string directory_;

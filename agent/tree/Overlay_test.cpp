@@ -80,6 +80,14 @@ class OverlayTest : public ::testing::Test {
   const std::string eth1_ = "/system/eth1/ip";
 };
 
+TEST_F(OverlayTest, ThereIsNothingToTakeBackWhereThereIsNoDirectory) {
+  std::filesystem::remove_all(data());
+
+  EXPECT_EQ(clearOverlay(), 0U);
+  EXPECT_EQ(clearOverlay("eth0"), 0U);
+  EXPECT_FALSE(std::filesystem::exists(data()));
+}
+
 TEST_F(OverlayTest, AValueThatIsSetWinsOverTheSourceFromTheNextPlacementOn) {
   Instrumentation before;
   before.selectNode(eth0_);
