@@ -283,6 +283,24 @@ TEST_F(DNSClientModification, AStepBeforeAnExceptionKeepsItsEffect) {
   EXPECT_EQ(2U, domainIsSet);  // setting the host name failed in both ways
 }
 
+TEST_F(DNSClientModification, AValueIsToldBeforeItIsSet) {
+  std::vector<std::string> toldLast;
+  forEachTreeFailure([&](std::size_t, Thrown) {
+    restore();
+    logger_.clear();
+    try {
+      modify(kWhole);
+    } catch (int) {
+    }
+    const bool domainFailed = node(0) == std::vector{"a.example.org b"s, "example.org"s, "host1"s};
+    const bool hostFailed = node(0) == std::vector{"a.example.org b"s, "new.example.org"s, "host1"s};
+    if (domainFailed || hostFailed) toldLast.push_back(logger_.pairs().ofKind(LineKind::Variable).back().brief());
+  });
+  EXPECT_THAT(toldLast, ::testing::UnorderedElementsAre(
+                            "4000 VARIABLE domainName = new.example.org", "4000 VARIABLE domainName = new.example.org",
+                            "4000 VARIABLE hostName = newhost", "4000 VARIABLE hostName = newhost"));
+}
+
 TEST_F(DNSClientModification, ValuesThatCannotBeStoredAreNotLookedAt) {
   std::filesystem::remove_all(world_.dataDir());
   const Outcome outcome = modify(kWhole);

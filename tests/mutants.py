@@ -93,7 +93,9 @@ def mutants_of_line(file, number, line):
             yield replaced(blank, blank + 1, "", "blank in text")
     for m in re.finditer(r"(?<![\w.])(\d+)(?![\w.])", code):
         if outside(m.start()):
-            yield replaced(m.start(), m.end(), str(int(m.group()) + 1), "number")
+            # 1 is often a failure, which callers tell from 0 alone.
+            other = "0" if m.group() == "1" else str(int(m.group()) + 1)
+            yield replaced(m.start(), m.end(), other, "number")
     for m in re.finditer(r" (==|!=|<=|>=|<|>) ", code):
         if outside(m.start()):
             other = {"==": "!=", "!=": "==", "<": "<=", "<=": "<", ">": ">=", ">=": ">"}[m.group(1)]

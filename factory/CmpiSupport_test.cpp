@@ -1,0 +1,50 @@
+#include "factory/CmpiSupport.h"
+
+#include <gmock/gmock.h>
+
+#include "RecordingBroker.h"
+
+namespace ZV::Test {
+namespace {
+
+using ::testing::IsEmpty;
+
+// What a function of the factories gave is perhaps nothing, or an object without a handle: it is not used then.
+class CmpiSupport : public ::testing::Test {
+ protected:
+  CMPIObjectPath* path(const char* className) { return broker_.make(Path(className)); }
+  CMPIObjectPath* withoutHandle() {
+    CMPIObjectPath* broken = path("ZORVA_X");
+    broken->hdl = nullptr;
+    return broken;
+  }
+
+  RecordingBroker broker_;
+};
+
+TEST_F(CmpiSupport, AReferenceKeyNeedsBothPaths) {
+  addReferenceKey(path("ZORVA_X"), "Dependent", nullptr);
+  addReferenceKey(path("ZORVA_X"), "Dependent", withoutHandle());
+  addReferenceKey(nullptr, "Dependent", path("ZORVA_Y"));
+  addReferenceKey(withoutHandle(), "Dependent", path("ZORVA_Y"));
+  EXPECT_THAT(broker_.calls(), IsEmpty());
+}
+
+TEST_F(CmpiSupport, ATextKeyNeedsItsPath) {
+  addTextKey(nullptr, "Name", "eth0");
+  addTextKey(withoutHandle(), "Name", "eth0");
+  EXPECT_THAT(broker_.calls(), IsEmpty());
+}
+
+TEST_F(CmpiSupport, AReferencePropertyNeedsItsInstanceAndItsPath) {
+  CMPIInstance* instance = broker_.make(Instance("ZORVA_X"));
+  setReference(instance, "Dependent", nullptr);
+  setReference(instance, "Dependent", withoutHandle());
+  setReference(nullptr, "Dependent", path("ZORVA_Y"));
+  instance->hdl = nullptr;
+  setReference(instance, "Dependent", path("ZORVA_Y"));
+  EXPECT_THAT(broker_.calls(), IsEmpty());
+}
+
+}  // namespace
+}  // namespace ZV::Test
