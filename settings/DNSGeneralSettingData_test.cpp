@@ -4,6 +4,7 @@
 
 #include "RecordingLogger.h"
 #include "World.h"
+#include "settings/FileAtEachLine.h"
 
 namespace ZV::Test {
 namespace {
@@ -256,6 +257,14 @@ TEST_F(DNSGeneralSettingDataTest, SetConfigurationNameTellsTheFileAndReplacesThe
   const LogLines lines = logger.pairs();
   EXPECT_THAT(lines.briefsWithCategory(), ElementsAre(variable("l_strFileName", world_.filePath("eth0"))));
   EXPECT_EQ("setConfigurationName", lines.at(0).function);
+}
+
+TEST_F(DNSGeneralSettingDataTest, SetConfigurationNameTellsTheFileBeforeItWrites) {
+  world_.file("eth0", "CONFIG_NAME=office\n");
+  DNSGeneralSettingData data = atUsualNic();
+  const FileAtEachLine file(world_, "eth0");
+  data.setConfigurationName("home");
+  EXPECT_THAT(file.contents, ElementsAre("CONFIG_NAME=office\n"s));
 }
 
 TEST_F(DNSGeneralSettingDataTest, SetConfigurationNameAddsTheKey) {

@@ -4,6 +4,7 @@
 
 #include "RecordingLogger.h"
 #include "World.h"
+#include "settings/FileAtEachLine.h"
 
 namespace ZV::Test {
 namespace {
@@ -389,6 +390,14 @@ TEST_F(DNSSettingDataTest, SetConfigurationNameAddsTheKey) {
 TEST_F(DNSSettingDataTest, SetConfigurationNameSaysTrueAlsoWithoutAFile) {
   EXPECT_TRUE(atUsualNic().setConfigurationName("home"));
   EXPECT_EQ(std::nullopt, world_.fileContent("eth0"));
+}
+
+TEST_F(DNSSettingDataTest, SetConfigurationNameTellsTheFileBeforeItWrites) {
+  world_.file("eth0", "CONFIG_NAME=office\n");
+  DNSSettingData data = atUsualNic();
+  const FileAtEachLine file(world_, "eth0");
+  data.setConfigurationName("home");
+  EXPECT_THAT(file.contents, ElementsAre("CONFIG_NAME=office\n"s));
 }
 
 TEST_F(DNSSettingDataTest, SetConfigurationNameTellsTheFile) {
