@@ -49,7 +49,8 @@ if(ZORVA_FUZZ)
 endif()
 
 if(ZORVA_COVERAGE)
-  add_compile_options(--coverage -fprofile-abs-path)
+  # Threads count alike: without atomic counters some would come out below 0.
+  add_compile_options(--coverage -fprofile-abs-path -fprofile-update=atomic)
   add_link_options(--coverage)
 endif()
 
