@@ -50,7 +50,9 @@ endif()
 
 if(ZORVA_COVERAGE)
   # Threads count alike: without atomic counters some would come out below 0.
-  add_compile_options(--coverage -fprofile-abs-path -fprofile-update=atomic)
+  # Sources are named in full here, for the reports to find them, whatever the compiler's macros say.
+  add_compile_options(--coverage -fprofile-abs-path -fprofile-update=atomic
+    -fprofile-prefix-map=${CMAKE_SOURCE_DIR}/=${CMAKE_SOURCE_DIR}/)
   add_link_options(--coverage)
 endif()
 
