@@ -157,7 +157,8 @@ void Workers::Core::run() {
 
 /// False: there was nothing to do for so long that the thread should end.
 bool Workers::Core::sleep(std::unique_lock<std::mutex>& lock) {
-  Sleeper self(0);
+  // The thread's own: who wakes it may still be in release() when it is awake already.
+  static thread_local Sleeper self(0);
   sleepers_.push_back(&self);
   ++idle_;
   lock.unlock();
