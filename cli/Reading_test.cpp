@@ -5,6 +5,7 @@
 #include <filesystem>
 #include <nlohmann/json.hpp>
 
+#include "cimxml/testing/Grammar.h"
 #include "cli/TestHost.h"
 
 namespace zorva::cli {
@@ -327,11 +328,9 @@ TEST(Get, WritesMofAndXml) {
 }
 
 TEST(Enumerate, WritesXmlThatIsValid) {
-  if (std::string(ZORVA_CIM_DTD).empty()) GTEST_SKIP() << "DMTF's DTD is not at hand: ZORVA_CIM_DTD names it";
   const TestHost host({TestHost::port("e\\u0001\\\"<th", R"("dns_suffixes": ["a&b", "]]>"])")});
   for (const char* name : {"CIM_ManagedElement", "CIM_Dependency", "CIM_Component", "ZORVA_SPComputerSystem"}) {
-    const std::string file = host.directory().write("found.xml", shown(host, {"ei", name, "-o", "xml"}));
-    EXPECT_EQ(std::system(("xmllint --noout --nonet --dtdvalid " ZORVA_CIM_DTD " " + file).c_str()), 0) << name;
+    EXPECT_EQ(cimxml::testing::grammarProblem(shown(host, {"ei", name, "-o", "xml"})), "") << name;
   }
 }
 

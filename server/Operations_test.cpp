@@ -53,7 +53,6 @@ class OperationsTest : public ::testing::Test {
         {{"CIMOperation", "MethodCall"}, {"CIMMethod", method}, {"CIMObject", "root/cimv2:T_Thing.Name=\"a\""}});
     const testing::CollectingSink sink = service_.ask(asked);
     EXPECT_EQ(sink.status, 200) << sink.body;
-    EXPECT_EQ(testing::dtdProblem(sink.body), "") << sink.body;
     return sink.body;
   }
 

@@ -44,11 +44,6 @@ TEST(Service, AnswersInOnePieceWhatIsSmall) {
   EXPECT_THAT(sink.body, HasSubstr("<MESSAGE ID=\"42\" PROTOCOLVERSION=\"1.0\">"));
 }
 
-TEST(Service, IsHeldToTheDocumentTypeByTheseTests) {
-  if (testing::dtdProblem("<CIM/>").empty()) GTEST_SKIP() << "no DTD is at hand";
-  EXPECT_THAT(testing::dtdProblem("<CIM/>"), HasSubstr("does not"));
-}
-
 TEST(Service, SendsWhatIsLargeWhileItGrows) {
   ServiceOptions options;
   options.unsentText = 200;
@@ -56,7 +51,6 @@ TEST(Service, SendsWhatIsLargeWhileItGrows) {
   const CollectingSink sink = service.ask(testing::request("EnumerateInstances", kThings));
   EXPECT_GT(sink.pieces, 3U);
   EXPECT_LT(sink.largestPiece, 1000U);
-  EXPECT_EQ(testing::dtdProblem(sink.body), "");
 }
 
 TEST(Service, TellsAFailureThatComesTooLateThroughTheSink) {
@@ -88,7 +82,6 @@ TEST(Service, AnswersEachOfSeveralRequests) {
                                    intrinsic("EnumerateInstanceNames", kThings) + "</MULTIREQ>");
   const CollectingSink sink = service.ask(post(body, {{"CIMOperation", "MethodCall"}, {"CIMBatch", ""}}));
   EXPECT_EQ(sink.status, 200);
-  EXPECT_EQ(testing::dtdProblem(sink.body), "") << sink.body;
   EXPECT_THAT(sink.body, HasSubstr("<MULTIRSP><SIMPLERSP><IMETHODRESPONSE NAME=\"EnumerateClassNames\">"));
   EXPECT_THAT(sink.body, HasSubstr("<IMETHODRESPONSE NAME=\"GetClass\"><ERROR CODE=\"6\""));
   EXPECT_THAT(sink.body, HasSubstr("<IMETHODRESPONSE NAME=\"EnumerateInstanceNames\"><IRETURNVALUE><INSTANCENAME"));
