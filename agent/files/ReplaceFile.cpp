@@ -1,35 +1,26 @@
 #include "agent/files/ReplaceFile.h"
 
 #include <fcntl.h>
-#include <sys/file.h>
 #include <unistd.h>
 
 #include <cerrno>
-#include <chrono>
-#include <stdexcept>
 #include <string_view>
 #include <system_error>
-#include <thread>
 
+#include "agent/files/FileDescriptor.h"
+#include "agent/files/FileError.h"
 #include "agent/log/LogOutput.h"
 
 namespace zorvagent {
 namespace {
 
-constexpr mode_t kLockMode = 0600;
 constexpr mode_t kFileMode = 0644;
-constexpr std::chrono::seconds kLongestWait{10};
-constexpr std::chrono::microseconds kPause{500};
-
-[[noreturn]] void fail(const std::string& path, const char* what) {
-  throw std::runtime_error(path + ": " + what + ": " + std::generic_category().message(errno));
-}
 
 void writeAll(const FileDescriptor& file, std::string_view text, const std::string& path) {
   while (!text.empty()) {
     const ssize_t written = ::write(file.get(), text.data(), text.size());
     if (written < 0 && errno == EINTR) continue;
-    if (written < 0) fail(path, "cannot be written");
+    if (written < 0) throwFileError(path, "cannot be written");
     text.remove_prefix(static_cast<std::size_t>(written));
   }
 }
@@ -60,33 +51,17 @@ class TemporaryFile {
 
 }  // namespace
 
-FileLock::FileLock(const std::string& path)
-    : file_(::open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW, kLockMode)) {
-  if (!file_) fail(path, "cannot be opened");
-  const auto deadline = std::chrono::steady_clock::now() + kLongestWait;
-  while (::flock(file_.get(), LOCK_EX | LOCK_NB) != 0) {
-    if (errno != EWOULDBLOCK && errno != EINTR) fail(path, "cannot be locked");
-    if (std::chrono::steady_clock::now() > deadline) {
-      throw std::runtime_error(path + ": another process has held the lock for ten seconds");
-    }
-    std::this_thread::sleep_for(kPause);
-  }
-}
-
-// A process that was forked meanwhile has the descriptor too, and closing ours alone would leave the lock held.
-FileLock::~FileLock() { ::flock(file_.get(), LOCK_UN); }
-
 void replaceFile(const std::string& directory, const std::string& name, const std::string& text) {
   const std::string target = directory + name;
   TemporaryFile temporary(target + ".new");
   {
     const FileDescriptor file(
         ::open(temporary.path().c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC | O_NOFOLLOW, kFileMode));
-    if (!file) fail(temporary.path(), "cannot be opened");
+    if (!file) throwFileError(temporary.path(), "cannot be opened");
     writeAll(file, text, temporary.path());
-    if (::fsync(file.get()) != 0) fail(temporary.path(), "cannot be synced");
+    if (::fsync(file.get()) != 0) throwFileError(temporary.path(), "cannot be synced");
   }
-  if (::rename(temporary.path().c_str(), target.c_str()) != 0) fail(target, "cannot be replaced");
+  if (::rename(temporary.path().c_str(), target.c_str()) != 0) throwFileError(target, "cannot be replaced");
   temporary.keep();
   syncDirectory(directory);
 }

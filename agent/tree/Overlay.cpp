@@ -6,6 +6,7 @@
 #include <stdexcept>
 #include <utility>
 
+#include "agent/files/FileLock.h"
 #include "agent/files/ReadFile.h"
 #include "agent/files/ReplaceFile.h"
 #include "agent/log/LogOutput.h"
