@@ -157,10 +157,13 @@ Status Broker::modifyInstance(const Instance& instance, const std::optional<std:
     InstanceObject* object = nullptr;
     Status status = makePath(request.arena(), instance.path, true, name);
     if (status.ok()) status = makeInstance(request.arena(), *name, instance, object);
+    std::unique_ptr<HeldClaim> claim;
+    if (status.ok()) status = request.claim(Access::Change, instance.path.className, &instance.path, claim);
     if (!status.ok()) return status;
     Shape shape;
     shape.properties = viewsOf(propertyList);
-    return request.modify(*name, *object, shape);
+    status = request.modify(*name, *object, shape);
+    return claim == nullptr ? status : claim->finish(std::move(status));
   });
 }
 

@@ -19,6 +19,7 @@ BrokerCore::BrokerCore(std::shared_ptr<const schema::ClassRepository> classes, B
       classes_(std::move(classes)),
       registry_(std::move(options.registry)),
       log_(std::move(options.log)),
+      claim_(std::move(options.claim)),
       loader_(*this, registry_, std::move(options.providerDirectory), std::move(options.linked)) {}
 
 BrokerCore::~BrokerCore() = default;

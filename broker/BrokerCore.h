@@ -39,6 +39,11 @@ class BrokerCore {
   /// Hands a line to the log hook. What the hook throws is lost.
   void log(LogLevel level, std::string_view text) const noexcept;
 
+  /// What the claim hook gives; null where there is none. Throws what the hook throws.
+  std::unique_ptr<Claim> claim(Access access, std::string_view className, const ObjectPath* changed) const {
+    return claim_ ? claim_(access, className, changed) : nullptr;
+  }
+
   /// A copy of a request's context for a thread that a provider is about to start. It lives until that thread detaches,
   /// or as long as the broker.
   ContextObject* prepareThread(const ContextObject& context);
@@ -56,6 +61,7 @@ class BrokerCore {
   BlockCache blocks_;
   ProviderRegistry registry_;
   LogHook log_;
+  ClaimHook claim_;
   std::mutex threadsMutex_;  // guards the two that follow
   std::vector<std::unique_ptr<Arena>> prepared_;
   std::vector<std::unique_ptr<Attached>> attached_;

@@ -75,6 +75,18 @@ Status Request::tooDeep() const {
   return failure(CMPI_RC_ERR_FAILED, "providers call one another more than " + std::to_string(kDeepest) + " deep");
 }
 
+Status Request::claim(Access access, std::string_view className, const ObjectPath* changed,
+                      std::unique_ptr<HeldClaim>& held) {
+  if (scope_.isClaimed()) return {};
+  try {
+    std::unique_ptr<Claim> claim = core_.claim(access, className, changed);
+    if (claim != nullptr) held = std::make_unique<HeldClaim>(scope_, std::move(claim));
+    return {};
+  } catch (const std::exception& problem) {
+    return failure(CMPI_RC_ERR_FAILED, problem.what());
+  }
+}
+
 Status Request::resolve(const PathObject& path, PathObject*& resolved) {
   Status status = tooDeep();
   if (!status.ok()) return status;
@@ -129,6 +141,10 @@ Status Request::call(ResultObject& result, const ProviderEntry& entry, std::stri
   Status status;
   const std::string what = entry.prefix + " (" + std::string(operation) + " of " + entry.className + ")";
   if (function == nullptr) return failure(CMPI_RC_ERR_NOT_SUPPORTED, what + " is not supported by the provider");
+  if ((result.accepts & (ResultObject::Instances | ResultObject::Paths)) != 0) {
+    status = claim(Access::Read, entry.className, nullptr, result.claim);
+    if (!status.ok()) return status;
+  }
   try {
     const CMPIStatus answer = function(args...);
     status.rc = answer.rc;

@@ -1,10 +1,12 @@
 #pragma once
 
+#include <memory>
 #include <string_view>
 #include <vector>
 
 #include "broker/BrokerCore.h"
 #include "broker/Convert.h"
+#include "broker/HeldClaim.h"
 #include "broker/Objects.h"
 #include "broker/Result.h"
 #include "broker/ResultFilter.h"
@@ -36,6 +38,10 @@ class Request {
   Arena& arena() noexcept { return scope_.arena(); }
   /// What the providers are given; empty at first.
   ContextObject& context() noexcept { return context_; }
+
+  /// Takes the claim that providers of a class need, unless this request has one already; `held` stays null where there
+  /// is none.
+  Status claim(Access access, std::string_view className, const ObjectPath* changed, std::unique_ptr<HeldClaim>& held);
 
   // The operations. `path` lives in this request's arena or outlives it; its namespace may be in any spelling, and
   // empty for the default. Statuses as Broker.h tells.

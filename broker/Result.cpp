@@ -19,6 +19,7 @@ CMPIResult* clone(const CMPIResult* handle, CMPIStatus* status) {
 template <class Take>
 CMPIStatus give(ResultObject& self, Take take) {
   const std::lock_guard lock(self.mutex);
+  self.claim.reset();
   if (self.full) return {CMPI_RC_ERR_FAILED, nullptr};
   try {
     self.full = !take();

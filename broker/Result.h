@@ -1,8 +1,10 @@
 #pragma once
 
+#include <memory>
 #include <mutex>
 #include <string>
 
+#include "broker/HeldClaim.h"
 #include "broker/Objects.h"
 
 // Where a provider puts its results: a CMPIResult that hands each of them on at once to a receiver.
@@ -44,8 +46,9 @@ struct ResultObject : CMPIResult {
   const std::string who;
   Arena* arena = nullptr;  ///< it is in none: release() is harmless
 
-  std::mutex mutex;   // guards what follows
-  bool full = false;  ///< the receiver wants no more
+  std::mutex mutex;                  // guards what follows
+  std::unique_ptr<HeldClaim> claim;  ///< goes with the first result
+  bool full = false;                 ///< the receiver wants no more
   CMPIrc errorCode = CMPI_RC_OK;
   std::string errorMessage;
 };

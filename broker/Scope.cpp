@@ -31,6 +31,13 @@ Scope::~Scope() {
 
 Scope* Scope::current() noexcept { return innermost; }
 
+bool Scope::isClaimed() const noexcept {
+  for (const Scope* scope = this; scope != nullptr; scope = scope->parent_) {
+    if (scope->isClaimed_) return true;
+  }
+  return false;
+}
+
 void Scope::share() noexcept {
   arena_.share();
   for (const auto& mark : marks_) mark->share();

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <atomic>
 #include <cstddef>
 #include <memory>
 #include <string_view>
@@ -32,6 +33,10 @@ class Scope {
   Scope* parent() const noexcept { return parent_; }
   unsigned depth() const noexcept { return depth_; }
 
+  /// Whether this request, or one that it is a part of, holds a claim. Others may ask and set it on any thread.
+  bool isClaimed() const noexcept;
+  void setClaimed(bool isClaimed) noexcept { isClaimed_ = isClaimed; }
+
   /// Where objects are made now: the arena of the latest mark, or the scope's own.
   Arena& arena() noexcept { return marks_.empty() ? arena_ : *marks_.back(); }
 
@@ -58,6 +63,7 @@ class Scope {
   BrokerCore& core_;
   Scope* const parent_;
   const unsigned depth_;
+  std::atomic<bool> isClaimed_ = false;
   Arena arena_;
   std::vector<std::unique_ptr<Arena>> marks_;
   std::unordered_map<void*, std::unique_ptr<void, FreeBlock>> blocks_;

@@ -86,6 +86,7 @@ void modifyInstance(const Arguments& arguments) {
   for (const Assignment& assignment : assignments) changes.push_back(parseChange(declared, assignment));
 
   const ChangeOptions options{arguments.only, arguments.dryRun};
+  const Session::Changing alone(session, options.dryRun);
   const broker::Instance instance = changeInstance(session, path, changes, options);
   if (arguments.output == OutputFormat::Json) {
     write(instanceJson(instance, 0) + "\n");

@@ -100,7 +100,7 @@ TEST(IfcfgInit, RefusesNamesThatLeadOutOfTheDirectory) {
 TEST(IfcfgInit, WritesWholeOrNotAtAll) {
   const TestHost host({TestHost::port("eth0", R"("domain_name": "a\nHOSTNAME=evil")")});
   expectRefused(host, {"ifcfg", "init", "eth0"}, 1, "DOMAINNAME would hold control characters: 'a\\nHOSTNAME=evil'");
-  EXPECT_TRUE(std::filesystem::is_empty(host.dataFile("")));
+  EXPECT_FALSE(std::filesystem::exists(host.dataFile("ifcfg-eth0")));
 }
 
 TEST(IfcfgShow, MarksTheLinesThatAreMissing) {
@@ -191,12 +191,12 @@ TEST_F(Changing, ModifyWarnsWhereTheKeyIsMissing) {
   EXPECT_EQ(file(), "HOSTNAME=new\n");
 }
 
-TEST_F(Changing, ModifyWarnsWhereTheFileCannotBeWritten) {
+TEST_F(Changing, ModifyIsRefusedToWhoMayNotWriteInTheDataDirectory) {
   ::chmod(host_.dataFile("ifcfg-eth0").c_str(), 0444);
   const Outcome outcome = host_.runAsNobody({"modify", kSetting, "DomainName=lab.example.org"});
   if (outcome.exitCode == 127) GTEST_SKIP() << "another user cannot run what was built here";
-  EXPECT_EQ(outcome.exitCode, 0);
-  EXPECT_THAT(outcome.err, HasSubstr("DomainName was not stored: the file cannot be written"));
+  EXPECT_EQ(outcome.exitCode, 1);
+  EXPECT_THAT(outcome.err, HasSubstr("settings.lock: cannot be opened: Permission denied"));
   EXPECT_EQ(file(), kWholeFile);
 }
 
@@ -204,7 +204,8 @@ TEST_F(Changing, IfcfgInitTellsWhereItMayNotWrite) {
   const Outcome outcome = host_.runAsNobody({"ifcfg", "init", "eth1"});
   if (outcome.exitCode == 127) GTEST_SKIP() << "another user cannot run what was built here";
   EXPECT_EQ(outcome.exitCode, 1);
-  EXPECT_THAT(outcome.err, HasSubstr("ifcfg-eth1: cannot be written: Permission denied"));
+  EXPECT_THAT(outcome.err, HasSubstr("nothing was changed: " + host_.dataFile("settings.lock") +
+                                     ": cannot be opened: Permission denied"));
 }
 
 TEST_F(Changing, ModifyWarnsOfFilesThatAreNone) {
@@ -224,10 +225,15 @@ TEST_F(Changing, ModifyWarnsOfAPropertyThatItsProviderKeeps) {
               HasSubstr("Caption was not stored: the provider changes no Caption"));
 }
 
-TEST(Modify, WarnsWhereTheAgentCannotStore) {
+TEST(Modify, SaysThatTheDataDirectoryIsMissing) {
   const TestHost host;
   std::filesystem::remove(host.dataFile(""));
-  EXPECT_THAT(host.run({"modify", kEndpoint, "DomainName=x.example"}).err, HasSubstr("DomainName was not stored"));
+  for (const char* object : {kEndpoint, kSetting}) {
+    expectRefused(host, {"modify", object, "DomainName=x.example"}, 1,
+                  "nothing was changed: " + host.dataFile("") +
+                      ": there is no such data directory\n"
+                      "zorvactl: make the data directory, or name another");
+  }
 }
 
 TEST_F(Changing, ModifyHandsOnTheRefusalOfADomain) {

@@ -173,21 +173,12 @@ const char* sourceName(SettingSource source) noexcept {
 }
 
 std::string interfaceOfSetting(const broker::Instance& setting) {
-  const std::string id = propertyText(setting, "InstanceID");
-  const std::size_t percent = id.find('%');
-  return percent == std::string::npos ? std::string() : id.substr(percent + 1);
+  return frontend::interfaceOfId(propertyText(setting, "InstanceID"));
 }
 
 std::optional<std::string> interfaceOfHostSettings(const Session& session) {
   if (session.isRemote()) return std::nullopt;
-  const auto tree = session.tree();
-  for (const zorvagent::Node& node : tree->nodes()) {
-    if (node.type() != zorvagent::NodeType::NetworkIPConfig) continue;
-    if (tree->parent(tree->parent(node)).description() == "BMC") continue;
-    const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
-    return name == nullptr ? std::string() : *name;
-  }
-  return std::nullopt;
+  return frontend::interfaceOfHostSettings(*session.tree());
 }
 
 std::vector<broker::Instance> instancesOf(Session& session, std::string_view className) {

@@ -6,15 +6,16 @@
 #include <vector>
 
 #include "cli/Session.h"
+#include "frontend/SettingsClaims.h"
 
 // What a person reads first: the DNS client configuration of the host in one view, asked of the providers.
 
 namespace zorva::cli {
 
-inline constexpr const char* kEndpointClass = "ZORVA_DNSProtocolEndPoint";
+using frontend::kEndpointClass;
+using frontend::kGeneralSettingClass;
+using frontend::kSettingClass;
 inline constexpr const char* kServerClass = "ZORVA_RemoteServiceAccessPoint";
-inline constexpr const char* kSettingClass = "ZORVA_DNSSettingData";
-inline constexpr const char* kGeneralSettingClass = "ZORVA_DNSGeneralSettingData";
 inline constexpr const char* kSystemClass = "ZORVA_ComputerSystem";
 
 /// Where the value of a setting comes from: the interface's file, the host, a value that was set and stands in for the

@@ -33,7 +33,10 @@ void initInterfaceFile(const Arguments& arguments) {
   const auto tree = session.tree();
   const SettingFile file(arguments.target);
   const std::vector<SettingLine> lines = settingsOfHost(interfaceNode(*tree, arguments.target));
-  if (!arguments.dryRun) file.write(lines, arguments.force);
+  if (!arguments.dryRun) {
+    const Session::Changing alone(session);
+    file.write(lines, arguments.force);
+  }
   if (arguments.output == OutputFormat::Json) {
     write(settingFileJson(file.path(), lines) + "\n");
     return;

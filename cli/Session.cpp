@@ -133,9 +133,21 @@ Operations& Session::cim() {
   broker::BrokerOptions options;
   options.providerDirectory =
       providerDirectory_.empty() ? broker::ProviderRegistry::builtInDirectory() : providerDirectory_;
+  options.claim = claims_.hook();
   options.log = [this](broker::LogLevel level, std::string_view text) { log(level, text); };
   cim_ = std::make_unique<LocalOperations>(classes(), std::move(options));
   return *cim_;
+}
+
+Session::Changing::Changing(const Session& session, bool isDryRun) {
+  if (session.isRemote() || isDryRun) return;
+  try {
+    hold_.emplace(session.claims_);
+  } catch (const std::runtime_error& error) {
+    const bool isMissing = ::access(zorvagent::dataDirectory().c_str(), F_OK) != 0;
+    throw Failure(ExitCode::Failed, "nothing was changed: " + printable(error.what()),
+                  isMissing ? "make the data directory, or name another: data_dir in the agent's configuration" : "");
+  }
 }
 
 void Session::placeLogSink() const {

@@ -2,6 +2,7 @@
 
 #include <functional>
 #include <memory>
+#include <optional>
 #include <stdexcept>
 #include <string>
 #include <string_view>
@@ -13,6 +14,7 @@
 #include "cli/Operations.h"
 #include "cli/Table.h"
 #include "cli/Text.h"
+#include "frontend/SettingsClaims.h"
 
 // One run of the program: the agent with its configuration, and who does the CIM operations, each set up when a command
 // first needs it. Belongs to one thread.
@@ -47,6 +49,17 @@ class Session {
   /// host, or the file that stands for it, cannot be read: the providers would only say that there is nothing.
   Operations& cim();
 
+  /// While it lives, nobody else changes settings of this host: for commands that read, decide and then change. Does
+  /// nothing where a server is asked or on a dry run. Throws Failure where the lock of the data directory cannot be
+  /// had.
+  class Changing {
+   public:
+    explicit Changing(const Session& session, bool isDryRun = false);
+
+   private:
+    std::optional<frontend::SettingsClaims::Hold> hold_;
+  };
+
   /// The classes alone, for commands that ask nothing of a provider.
   const std::shared_ptr<const schema::ClassRepository>& classes();
 
@@ -79,6 +92,7 @@ class Session {
   int quiet_ = 0;  // how many Quiet live
   std::string providerDirectory_;
   std::shared_ptr<const schema::ClassRepository> classes_;
+  frontend::SettingsClaims claims_;
   std::unique_ptr<Operations> cim_;
 };
 

@@ -133,6 +133,7 @@ void setServers(const Arguments& arguments) {
   requireReadable(arguments, "dns set");
   for (const std::string& server : arguments.values) requireAddress(server);
   Session session(arguments);
+  const Session::Changing alone(session, arguments.dryRun);
   change(session, arguments, settingOfInterface(session, arguments.target), kServers,
          broker::Value::textArray(arguments.values));
 }
@@ -141,6 +142,7 @@ void addServers(const Arguments& arguments) {
   requireReadable(arguments, "dns add");
   for (const std::string& server : arguments.values) requireAddress(server);
   Session session(arguments);
+  const Session::Changing alone(session, arguments.dryRun);
   const broker::Instance setting = settingOfInterface(session, arguments.target);
   change(session, arguments, setting, kServers,
          broker::Value::textArray(with(listOf(setting, kServers), arguments.values)));
@@ -149,6 +151,7 @@ void addServers(const Arguments& arguments) {
 void removeServers(const Arguments& arguments) {
   requireReadable(arguments, "dns remove");
   Session session(arguments);
+  const Session::Changing alone(session, arguments.dryRun);
   const broker::Instance setting = settingOfInterface(session, arguments.target);
   change(session, arguments, setting, kServers,
          broker::Value::textArray(without(listOf(setting, kServers), arguments.values, "server")));
@@ -158,6 +161,7 @@ void setDomain(const Arguments& arguments) {
   requireReadable(arguments, "domain");
   requirePlainText("NAME", arguments.values.front());
   Session session(arguments);
+  const Session::Changing alone(session, arguments.dryRun);
   change(session, arguments, settingOfInterface(session, arguments.target), "DomainName",
          broker::Value::text(arguments.values.front()));
 }
@@ -172,6 +176,7 @@ void setSuffixes(const Arguments& arguments) {
   requireReadable(arguments, "suffixes set");
   for (const std::string& suffix : arguments.values) requireSuffix(suffix);
   Session session(arguments);
+  const Session::Changing alone(session, arguments.dryRun);
   change(session, arguments, settingOfHost(session), kSuffixes, broker::Value::textArray(arguments.values));
 }
 
@@ -179,6 +184,7 @@ void addSuffixes(const Arguments& arguments) {
   requireReadable(arguments, "suffixes add");
   for (const std::string& suffix : arguments.values) requireSuffix(suffix);
   Session session(arguments);
+  const Session::Changing alone(session, arguments.dryRun);
   const broker::Instance setting = settingOfHost(session);
   change(session, arguments, setting, kSuffixes,
          broker::Value::textArray(with(listOf(setting, kSuffixes), arguments.values)));
@@ -187,6 +193,7 @@ void addSuffixes(const Arguments& arguments) {
 void removeSuffixes(const Arguments& arguments) {
   requireReadable(arguments, "suffixes remove");
   Session session(arguments);
+  const Session::Changing alone(session, arguments.dryRun);
   const broker::Instance setting = settingOfHost(session);
   change(session, arguments, setting, kSuffixes,
          broker::Value::textArray(without(listOf(setting, kSuffixes), arguments.values, "suffix")));

@@ -2,8 +2,10 @@
 
 #include <fcntl.h>
 #include <poll.h>
+#include <signal.h>
 #include <stdlib.h>
 #include <sys/ioctl.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -131,7 +133,17 @@ Outcome TestHost::run(const std::vector<std::string>& words, OutputTo output) co
 
 Outcome TestHost::runWith(const std::vector<std::pair<std::string, std::string>>& environment,
                           const std::vector<std::string>& words, OutputTo output) const {
-  return runAs(::geteuid(), environment, words, output);
+  return runPrepared([] { return true; }, environment, words, output);
+}
+
+Outcome TestHost::runLimited(std::size_t bytes, AtLimit atLimit, const std::vector<std::string>& words) const {
+  const auto limit = [&] {
+    const rlimit size{bytes, bytes};
+    const rlimit noCore{0, 0};
+    ::signal(SIGXFSZ, atLimit == AtLimit::WriteFails ? SIG_IGN : SIG_DFL);
+    return ::setrlimit(RLIMIT_FSIZE, &size) == 0 && ::setrlimit(RLIMIT_CORE, &noCore) == 0;
+  };
+  return runPrepared(limit, {}, words, OutputTo::Pipe);
 }
 
 Outcome TestHost::runAsNobody(const std::vector<std::string>& words) const {
@@ -139,13 +151,14 @@ Outcome TestHost::runAsNobody(const std::vector<std::string>& words) const {
   const bool isRoot = ::geteuid() == 0;
   ::chmod(directory_.path().c_str(), 0755);
   ::chmod(dataFile("").c_str(), isRoot ? 0755 : 0555);
-  Outcome outcome = runAs(isRoot ? nobody : ::geteuid(), {}, words, OutputTo::Pipe);
+  const auto become = [&] { return !isRoot || ::setuid(nobody) == 0; };
+  Outcome outcome = runPrepared(become, {}, words, OutputTo::Pipe);
   ::chmod(dataFile("").c_str(), 0755);
   return outcome;
 }
 
-Outcome TestHost::runAs(unsigned user, const Environment& environment, const std::vector<std::string>& words,
-                        OutputTo output) const {
+Outcome TestHost::runPrepared(const std::function<bool()>& prepare, const Environment& environment,
+                              const std::vector<std::string>& words, OutputTo output) const {
   const Pair out = makeOutput(output);
   const Pair err = makePipe();
   const pid_t child = ::fork();
@@ -155,7 +168,7 @@ Outcome TestHost::runAs(unsigned user, const Environment& environment, const std
     ::setenv("TERM", "xterm", 1);
     ::unsetenv("NO_COLOR");
     for (const auto& [name, value] : environment) ::setenv(name.c_str(), value.c_str(), 1);
-    if (user != ::geteuid() && ::setuid(user) != 0) ::_exit(127);
+    if (!prepare()) ::_exit(127);
     become(words, out.writer, err.writer);
   }
   ::close(out.writer);

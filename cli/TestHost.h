@@ -1,5 +1,6 @@
 #pragma once
 
+#include <functional>
 #include <string>
 #include <utility>
 #include <vector>
@@ -38,6 +39,12 @@ class TestHost {
   /// directories closed to them for writing. Exit code 127: that user cannot run the program.
   Outcome runAsNobody(const std::vector<std::string>& words) const;
 
+  /// What becomes of a run that writes past the most that a file may hold.
+  enum class AtLimit { WriteFails, IsKilled };
+
+  /// Runs it so that no file can grow past that many bytes, as on a full disk.
+  Outcome runLimited(std::size_t bytes, AtLimit atLimit, const std::vector<std::string>& words) const;
+
   const zorvagent::testing::TemporaryDirectory& directory() const { return directory_; }
   std::string dataFile(const std::string& name) const { return directory_ / "data/" + name; }
   void writeTree(const std::string& json) const;
@@ -48,8 +55,8 @@ class TestHost {
 
  private:
   using Environment = std::vector<std::pair<std::string, std::string>>;
-  Outcome runAs(unsigned user, const Environment& environment, const std::vector<std::string>& words,
-                OutputTo output) const;
+  Outcome runPrepared(const std::function<bool()>& prepare, const Environment& environment,
+                      const std::vector<std::string>& words, OutputTo output) const;
 
   zorvagent::testing::TemporaryDirectory directory_;
 };

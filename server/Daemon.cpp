@@ -19,6 +19,7 @@
 #include <vector>
 
 #include "agent/Agent.h"
+#include "frontend/SettingsClaims.h"
 #include "schema/Schema.h"
 #include "server/HttpServer.h"
 #include "server/Interop.h"
@@ -79,6 +80,15 @@ ServiceOptions serviceOptions(const Config& config) {
   options.maxPulls = static_cast<std::size_t>(config.pullContexts);
   options.maxPullBytes = static_cast<std::size_t>(config.pullMebibytes) << 20;
   return options;
+}
+
+/// What a process that was killed left of a change is put back by who takes the lock next.
+void mendSettings() noexcept {
+  try {
+    const zorvagent::SettingsLock lock(zorvagent::dataDirectory(), zorvagent::Access::Read);
+  } catch (const std::exception& error) {
+    ZORVA_LOG(Error, error.what());
+  }
 }
 
 class Daemon {
@@ -248,6 +258,7 @@ int serve(const CommandLine& commandLine, const MakeBroker& makeBroker) {
   ::mallopt(M_ARENA_MAX, 2);
   zorvagent::loadConfig(config.agentConfig);
   applyLog(config);
+  mendSettings();
   auto daemon = std::make_unique<Daemon>(commandLine, std::move(config), makeBroker);
   if (daemon->run()) return kServed;
   ZORVA_LOG(Error, "ended while providers had not returned");
@@ -262,6 +273,7 @@ std::unique_ptr<broker::Broker> makeBuiltInBroker(const Config& config) {
   options.providerDirectory =
       config.providerDirectory.empty() ? broker::ProviderRegistry::builtInDirectory() : config.providerDirectory;
   options.log = logBrokerLine;
+  options.claim = frontend::SettingsClaims().hook();
   serveInterop(options);
   return std::make_unique<broker::Broker>(schema::loadBuiltInClasses(schema::ClassSet::Interop), std::move(options));
 }

@@ -4,9 +4,9 @@
 #include <sys/file.h>
 
 #include <cerrno>
-#include <chrono>
 #include <stdexcept>
 #include <thread>
+#include <utility>
 
 #include "agent/files/FileError.h"
 
@@ -17,13 +17,26 @@ constexpr mode_t kLockMode = 0600;
 constexpr std::chrono::seconds kLongestWait{10};
 constexpr std::chrono::microseconds kPause{500};
 
+FileDescriptor opened(const std::string& path) {
+  FileDescriptor file = openLockFile(path, kLockMode);
+  if (!file) throwFileError(path, "cannot be opened");
+  return file;
+}
+
 }  // namespace
 
-FileLock::FileLock(const std::string& path)
-    : file_(::open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW, kLockMode)) {
-  if (!file_) throwFileError(path, "cannot be opened");
-  const auto deadline = std::chrono::steady_clock::now() + kLongestWait;
-  while (::flock(file_.get(), LOCK_EX | LOCK_NB) != 0) {
+FileDescriptor openLockFile(const std::string& path, mode_t rights) {
+  return FileDescriptor(::open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK, rights));
+}
+
+FileLock::Deadline FileLock::usualDeadline() { return std::chrono::steady_clock::now() + kLongestWait; }
+
+FileLock::FileLock(const std::string& path) : FileLock(opened(path), path, Mode::Exclusive, usualDeadline()) {}
+
+FileLock::FileLock(FileDescriptor file, const std::string& path, Mode mode, Deadline deadline)
+    : file_(std::move(file)) {
+  const int operation = (mode == Mode::Exclusive ? LOCK_EX : LOCK_SH) | LOCK_NB;
+  while (::flock(file_.get(), operation) != 0) {
     if (errno != EWOULDBLOCK && errno != EINTR) throwFileError(path, "cannot be locked");
     if (std::chrono::steady_clock::now() > deadline) {
       throw std::runtime_error(path + ": another process has held the lock for ten seconds");

@@ -1,24 +1,43 @@
 // Locks among processes, by way of files.
 #pragma once
 
+#include <sys/types.h>
+
+#include <chrono>
 #include <string>
 
 #include "agent/files/FileDescriptor.h"
 
 namespace zorvagent {
 
-// An exclusive lock among processes, and among threads, by way of a file of its own that is never removed. Held until
-// the object ends.
+// A lock among processes, and among threads, by way of a file of its own that is never removed. Each object has its own
+// open file. Held until the object ends.
 class FileLock {
  public:
-  // Waits for the lock, ten seconds at most. Throws std::runtime_error, with one line, where it cannot be had.
+  enum class Mode { Shared, Exclusive };
+  using Deadline = std::chrono::steady_clock::time_point;
+
+  // Ten seconds from now: nobody who holds a lock needs longer.
+  static Deadline usualDeadline();
+
+  // Opens the file, or makes it, and waits for the exclusive lock until the usual deadline. Throws std::runtime_error,
+  // with one line, where it cannot be had.
   explicit FileLock(const std::string& path);
+
+  // Locks a file that is open. An exclusive lock may need one that is open for writing.
+  FileLock(FileDescriptor file, const std::string& path, Mode mode, Deadline deadline);
+
   ~FileLock();
   FileLock(const FileLock&) = delete;
   FileLock& operator=(const FileLock&) = delete;
 
+  int descriptor() const { return file_.get(); }
+
  private:
   FileDescriptor file_;
 };
+
+// Opens a lock's file for reading and writing, or makes it with these rights. errno says why there is none.
+FileDescriptor openLockFile(const std::string& path, mode_t rights);
 
 }  // namespace zorvagent

@@ -49,21 +49,41 @@ class TemporaryFile {
   std::string path_;
 };
 
+// The owner first: a change of it takes rights away.
+void giveRights(const FileDescriptor& file, const struct stat& like) {
+  (void)!::fchown(file.get(), like.st_uid, like.st_gid);
+  ::fchmod(file.get(), like.st_mode & 0777U);
+}
+
 }  // namespace
 
-void replaceFile(const std::string& directory, const std::string& name, const std::string& text) {
+void replaceFile(const std::string& directory, const std::string& name, const std::string& text,
+                 const struct stat* like) {
   const std::string target = directory + name;
   TemporaryFile temporary(target + ".new");
   {
-    const FileDescriptor file(
-        ::open(temporary.path().c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC | O_NOFOLLOW, kFileMode));
+    const FileDescriptor file(::open(temporary.path().c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC | O_NOFOLLOW,
+                                     like == nullptr ? kFileMode : S_IRUSR | S_IWUSR));
     if (!file) throwFileError(temporary.path(), "cannot be opened");
+    if (like != nullptr) giveRights(file, *like);
     writeAll(file, text, temporary.path());
     if (::fsync(file.get()) != 0) throwFileError(temporary.path(), "cannot be synced");
   }
   if (::rename(temporary.path().c_str(), target.c_str()) != 0) throwFileError(target, "cannot be replaced");
   temporary.keep();
   syncDirectory(directory);
+}
+
+void overwriteFile(const std::string& path, const std::string& text) {
+  const FileDescriptor file(::open(path.c_str(), O_WRONLY | O_TRUNC | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
+  if (!file) throwFileError(path, "cannot be opened");
+  writeAll(file, text, path);
+  if (::fsync(file.get()) != 0) throwFileError(path, "cannot be synced");
+}
+
+bool syncFile(const std::string& path) {
+  const FileDescriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
+  return file && ::fsync(file.get()) == 0;
 }
 
 }  // namespace zorvagent

@@ -1,0 +1,236 @@
+#include "agent/SettingsLock.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <optional>
+#include <stdexcept>
+#include <utility>
+
+#include "agent/files/FileError.h"
+#include "agent/files/FileLock.h"
+#include "agent/files/ReadFile.h"
+#include "agent/files/ReplaceFile.h"
+#include "agent/files/Rewrite.h"
+#include "agent/log/LogOutput.h"
+
+namespace zorvagent {
+namespace {
+
+constexpr const char* kLockName = "settings.lock";
+constexpr const char* kTurnName = "settings.turn";
+constexpr const char* kKeptName = "settings.before";
+constexpr std::size_t kLargestFile = std::size_t{16} << 20U;
+constexpr std::size_t kLongestName = 255;
+
+// Who may put files into the directory may lock it. Nobody else: a lock that anybody can hold is one that anybody can
+// keep from others.
+mode_t lockRights(const std::string& directory) {
+  struct stat status {};
+  if (::stat(directory.c_str(), &status) != 0) return 0600;
+  const mode_t writers = status.st_mode & 0022;
+  return 0600 | writers | writers << 1U;
+}
+
+FileDescriptor openForChange(const std::string& directory, const char* name) {
+  const mode_t rights = lockRights(directory);
+  FileDescriptor file = openLockFile(directory + name, rights);
+  if (!file && errno == ENOENT) throw std::runtime_error(directory + ": there is no such data directory");
+  if (!file) throwFileError(directory + name, "cannot be opened");
+  struct stat status {};
+  // What the process masks of new files' rights.
+  if (::fstat(file.get(), &status) == 0 && (status.st_mode & 0666) != rights && status.st_uid == ::geteuid()) {
+    ::fchmod(file.get(), rights);
+  }
+  return file;
+}
+
+// None where that file cannot be opened, or made.
+FileDescriptor openForRead(const std::string& directory, const char* name) {
+  FileDescriptor file = openLockFile(directory + name, lockRights(directory));
+  if (file) return file;
+  return FileDescriptor(::open((directory + name).c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
+}
+
+std::string interfaceFile(const std::string& directory, const std::string& interface) {
+  return directory + "ifcfg-" + interface;
+}
+
+bool canBeAName(const std::string& interface) {
+  return !interface.empty() && interface.size() <= kLongestName &&
+         interface.find_first_of(std::string("/\0\n", 3)) == std::string::npos;
+}
+
+// The lock with the turn taken before it.
+FileLock takeInTurn(FileDescriptor turn, FileDescriptor lock, const std::string& directory, FileLock::Mode mode,
+                    FileLock::Deadline deadline) {
+  std::optional<FileLock> myTurn;
+  if (turn) myTurn.emplace(std::move(turn), directory + kTurnName, mode, deadline);
+  return {std::move(lock), directory + kLockName, mode, deadline};
+}
+
+}  // namespace
+
+class SettingsLock::Core {
+ public:
+  // Waits for the exclusive lock, and puts back what another process left.
+  explicit Core(const std::string& directory, FileLock::Deadline deadline)
+      : directory_(directory),
+        lock_(takeInTurn(openForChange(directory, kTurnName), openForChange(directory, kLockName), directory,
+                         FileLock::Mode::Exclusive, deadline)) {
+    putBackWhatIsLeft();
+  }
+
+  // Waits for the shared lock.
+  Core(const std::string& directory, FileDescriptor turn, FileDescriptor file, FileLock::Deadline deadline)
+      : directory_(directory),
+        lock_(takeInTurn(std::move(turn), std::move(file), directory, FileLock::Mode::Shared, deadline)) {}
+
+  // Whether the file of an interface was being changed when the process ended that did it.
+  bool isSomethingLeft() const {
+    struct stat status {};
+    return ::fstat(lock_.descriptor(), &status) == 0 && status.st_size > 0;
+  }
+
+  void keepAside(const std::string& interface);
+  std::string finish();
+
+ private:
+  void putBackWhatIsLeft();
+  void putBack(const std::string& path, const std::string& text) const;
+  std::string nameInLock() const;
+  void writeNameIntoLock(const std::string& name) const;
+  void forget();
+
+  std::string directory_;
+  FileLock lock_;
+  std::string interface_;  // whose file is kept aside; empty: none
+  std::string before_;     // its text
+};
+
+std::string SettingsLock::Core::nameInLock() const {
+  std::string name(kLongestName, '\0');
+  const ssize_t got = ::pread(lock_.descriptor(), name.data(), name.size(), 0);
+  name.resize(got > 0 ? static_cast<std::size_t>(got) : 0);
+  return name;
+}
+
+void SettingsLock::Core::writeNameIntoLock(const std::string& name) const {
+  const std::string path = directory_ + kLockName;
+  const auto size = static_cast<ssize_t>(name.size());
+  if (::pwrite(lock_.descriptor(), name.data(), name.size(), 0) != size || ::fdatasync(lock_.descriptor()) != 0) {
+    const int error = errno;
+    (void)!::ftruncate(lock_.descriptor(), 0);
+    errno = error;
+    throwFileError(path, "cannot be written");
+  }
+}
+
+void SettingsLock::Core::forget() {
+  (void)!::ftruncate(lock_.descriptor(), 0);
+  ::unlink((directory_ + kKeptName).c_str());
+  interface_.clear();
+  before_.clear();
+}
+
+void SettingsLock::Core::keepAside(const std::string& interface) {
+  putBackWhatIsLeft();
+  if (!canBeAName(interface)) return;  // no file has such a name
+  const std::string path = interfaceFile(directory_, interface);
+  FileText file = readFile(path, kLargestFile);
+  if (file.truncated) throw std::runtime_error(path + ": is larger than 16 MiB, and is left as it is");
+  if (mayPass(file.error)) throw std::runtime_error(path + ": cannot be read: " + fileErrorText(file.error));
+  if (file.error != 0) return;  // what cannot be read cannot be rewritten
+  struct stat rights {};
+  if (::stat(path.c_str(), &rights) != 0) throwFileError(path, "cannot be looked at");
+  replaceFile(directory_, kKeptName, file.text, &rights);
+  writeNameIntoLock(interface);
+  interface_ = interface;
+  before_ = std::move(file.text);
+}
+
+// In place, so that the file keeps its owner and its links. A full disk may not take that; what is kept aside then
+// takes the file's place.
+void SettingsLock::Core::putBack(const std::string& path, const std::string& text) const {
+  try {
+    overwriteFile(path, text);
+  } catch (const std::exception&) {
+    struct stat status {};
+    const bool isLink = ::lstat(path.c_str(), &status) == 0 && S_ISLNK(status.st_mode);
+    if (isLink || ::rename((directory_ + kKeptName).c_str(), path.c_str()) != 0) throw;
+  }
+}
+
+std::string SettingsLock::Core::finish() {
+  if (interface_.empty()) return {};
+  const std::string path = interfaceFile(directory_, interface_);
+  const FileText now = readFile(path, kLargestFile);
+  const bool isCut =
+      now.error == 0 && !now.truncated && (compareRewrite(before_, now.text) == Rewrite::CutShort || !syncFile(path));
+  if (!isCut) {
+    forget();
+    return {};
+  }
+  try {
+    putBack(path, before_);
+    forget();
+    return path + ": could not be written whole, and is as it was before; is the disk full?";
+  } catch (const std::exception& error) {
+    interface_.clear();
+    return path + ": could not be written whole, nor put back; " + directory_ + kKeptName + " has what was in it (" +
+           error.what() + ")";
+  }
+}
+
+void SettingsLock::Core::putBackWhatIsLeft() {
+  if (!isSomethingLeft()) return;
+  const std::string interface = nameInLock();
+  const std::string path = interfaceFile(directory_, interface);
+  const FileText before = readFile(directory_ + kKeptName, kLargestFile);
+  const FileText now = readFile(path, kLargestFile);
+  const bool isCut = canBeAName(interface) && before.error == 0 && now.error == 0 && !now.truncated &&
+                     compareRewrite(before.text, now.text) == Rewrite::CutShort;
+  if (mayPass(before.error) || mayPass(now.error)) {
+    throw std::runtime_error(path + ": a change of it broke off, and whether it is whole cannot be seen now");
+  }
+  if (isCut) {
+    putBack(path, before.text);
+    ZORVAGENT_LOG_ERROR(path + ": a change broke off in the middle; the file is as it was before");
+  }
+  forget();
+}
+
+SettingsLock::SettingsLock(const std::string& directory, Access access) {
+  const FileLock::Deadline deadline = FileLock::usualDeadline();
+  if (access == Access::Change) {
+    core_ = std::make_unique<Core>(directory, deadline);
+    return;
+  }
+  for (int attempt = 0;; ++attempt) {
+    FileDescriptor lock = openForRead(directory, kLockName);
+    if (!lock) return;
+    core_ = std::make_unique<Core>(directory, openForRead(directory, kTurnName), std::move(lock), deadline);
+    if (attempt == 1 || !core_->isSomethingLeft()) return;
+    core_.reset();
+    try {
+      const Core exclusive(directory, deadline);
+    } catch (const std::exception& error) {
+      // Who may not write leaves it to somebody who may.
+      ZORVAGENT_LOG_ERROR(error.what());
+    }
+  }
+}
+
+SettingsLock::~SettingsLock() {
+  if (core_ == nullptr) return;
+  const std::string problem = core_->finish();
+  if (!problem.empty()) ZORVAGENT_LOG_ERROR(problem);
+}
+
+void SettingsLock::keepAside(const std::string& interface) { core_->keepAside(interface); }
+
+std::string SettingsLock::finish() { return core_ == nullptr ? std::string() : core_->finish(); }
+
+}  // namespace zorvagent

@@ -1,0 +1,234 @@
+#include "agent/SettingsLock.h"
+
+#include <fcntl.h>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <sys/file.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <atomic>
+#include <filesystem>
+#include <thread>
+#include <vector>
+
+#include "agent/files/FileDescriptor.h"
+#include "agent/files/FileLock.h"
+#include "agent/testing/TemporaryDirectory.h"
+
+namespace zorvagent {
+namespace {
+
+using testing::contentsOf;
+using ::testing::HasSubstr;
+using testing::TemporaryDirectory;
+
+constexpr const char* kFile = "HOSTNAME=host1\nDOMAINNAME=example.org\nMTU=1500\n";
+
+bool canLock(const std::string& path, int operation) {
+  const FileDescriptor file(::open(path.c_str(), O_RDWR | O_CLOEXEC));
+  return file && ::flock(file.get(), operation | LOCK_NB) == 0;
+}
+
+TEST(SettingsLock, ReadersShareItAndAChangeHasItAlone) {
+  const TemporaryDirectory directory;
+  {
+    const SettingsLock one(directory.path(), Access::Read);
+    const SettingsLock other(directory.path(), Access::Read);
+    EXPECT_TRUE(canLock(directory / "settings.lock", LOCK_SH));
+    EXPECT_FALSE(canLock(directory / "settings.lock", LOCK_EX));
+  }
+  const SettingsLock change(directory.path(), Access::Change);
+  EXPECT_FALSE(canLock(directory / "settings.lock", LOCK_SH));
+}
+
+TEST(FileLock, WaitsNoLongerThanItIsTold) {
+  const TemporaryDirectory directory;
+  const std::string path = directory / "lock";
+  const FileLock held(path);
+  try {
+    const auto deadline = std::chrono::steady_clock::now() + std::chrono::milliseconds(20);
+    const FileLock other(openLockFile(path, 0600), path, FileLock::Mode::Shared, deadline);
+    FAIL();
+  } catch (const std::runtime_error& error) {
+    EXPECT_EQ(error.what(), path + ": another process has held the lock for ten seconds");
+  }
+}
+
+TEST(SettingsLock, ThreadsOfOneProcessExcludeEachOther) {
+  const TemporaryDirectory directory;
+  std::atomic<int> inside = 0;
+  std::vector<std::thread> threads;
+  threads.reserve(4);
+  for (int i = 0; i < 4; ++i) {
+    threads.emplace_back([&] {
+      for (int n = 0; n < 20; ++n) {
+        const SettingsLock lock(directory.path(), Access::Change);
+        EXPECT_EQ(++inside, 1);
+        std::this_thread::yield();
+        --inside;
+      }
+    });
+  }
+  for (std::thread& each : threads) each.join();
+}
+
+TEST(SettingsLock, AChangeGetsItsTurnAlthoughReadersNeverLeaveItFree) {
+  const TemporaryDirectory directory;
+  std::atomic<bool> done = false;
+  std::vector<std::thread> readers;
+  readers.reserve(3);
+  for (int i = 0; i < 3; ++i) {
+    readers.emplace_back([&, i] {
+      while (!done) {
+        const SettingsLock lock(directory.path(), Access::Read);
+        std::this_thread::sleep_for(std::chrono::milliseconds(20 + i));
+      }
+    });
+  }
+  for (int i = 0; i < 5; ++i) EXPECT_NO_THROW(SettingsLock(directory.path(), Access::Change));
+  done = true;
+  for (std::thread& each : readers) each.join();
+}
+
+TEST(SettingsLock, WhoReadsNeedsNoDirectory) {
+  EXPECT_NO_THROW(SettingsLock("/nowhere/", Access::Read));
+  try {
+    const SettingsLock lock("/nowhere/", Access::Change);
+    FAIL();
+  } catch (const std::runtime_error& error) {
+    EXPECT_STREQ(error.what(), "/nowhere/: there is no such data directory");
+  }
+}
+
+TEST(SettingsLock, OnlyThoseWhoMayWriteTheDirectoryMayHoldIt) {
+  const TemporaryDirectory directory;
+  ::chmod(directory.path().c_str(), 0775);
+  const SettingsLock lock(directory.path(), Access::Change);
+  struct stat status {};
+  ASSERT_EQ(::stat((directory / "settings.lock").c_str(), &status), 0);
+  EXPECT_EQ(status.st_mode & 0777U, 0660U);
+}
+
+TEST(SettingsLock, WhoMayNotOpenItReadsAllTheSame) {
+  if (::geteuid() != 0) GTEST_SKIP() << "only root can become somebody else";
+  const TemporaryDirectory directory;
+  ::chmod(directory.path().c_str(), 0755);
+  const SettingsLock change(directory.path(), Access::Change);
+  EXPECT_TRUE(testing::succeedsInChild([&] {
+    if (::setuid(65534) != 0) return false;
+    const SettingsLock lock(directory.path(), Access::Read);
+    return true;
+  }));
+}
+
+/// A change in which the file becomes that text.
+std::string finishAfter(const TemporaryDirectory& directory, const std::string& text) {
+  directory.write("ifcfg-eth0", kFile);
+  SettingsLock lock(directory.path(), Access::Change);
+  lock.keepAside("eth0");
+  EXPECT_EQ(contentsOf(directory / "settings.before"), kFile);
+  directory.write("ifcfg-eth0", text);
+  std::string problem = lock.finish();
+  EXPECT_FALSE(std::filesystem::exists(directory / "settings.before"));
+  EXPECT_EQ(contentsOf(directory / "settings.lock"), "");
+  return problem;
+}
+
+TEST(SettingsLock, AFileThatWasRewrittenWholeStays) {
+  const TemporaryDirectory directory;
+  EXPECT_EQ(finishAfter(directory, "HOSTNAME=new\nDOMAINNAME=example.org\nMTU=1500\n"), "");
+  EXPECT_EQ(contentsOf(directory / "ifcfg-eth0"), "HOSTNAME=new\nDOMAINNAME=example.org\nMTU=1500\n");
+}
+
+TEST(SettingsLock, AFileThatWasCutShortIsPutBack) {
+  const TemporaryDirectory directory;
+  for (const char* text : {"", "HOSTNAME=ne", "HOSTNAME=new\nDOMAINNAME=example.org\n"}) {
+    EXPECT_THAT(finishAfter(directory, text), HasSubstr("ifcfg-eth0: could not be written whole, and is as it was"));
+    EXPECT_EQ(contentsOf(directory / "ifcfg-eth0"), kFile);
+  }
+}
+
+TEST(SettingsLock, WhatSomebodyElseWroteMeanwhileStays) {
+  const TemporaryDirectory directory;
+  EXPECT_EQ(finishAfter(directory, "OTHER=1\n"), "");
+  EXPECT_EQ(contentsOf(directory / "ifcfg-eth0"), "OTHER=1\n");
+}
+
+TEST(SettingsLock, NothingIsKeptAsideOfWhatIsNoFile) {
+  const TemporaryDirectory directory;
+  SettingsLock lock(directory.path(), Access::Change);
+  for (const std::string& name : {std::string("eth9"), std::string("../x"), std::string(), std::string("a\0b", 3)}) {
+    EXPECT_NO_THROW(lock.keepAside(name));
+  }
+  EXPECT_FALSE(std::filesystem::exists(directory / "settings.before"));
+}
+
+TEST(SettingsLock, TheFileThatIsKeptAsideIsAsClosedToOthersAsItself) {
+  const TemporaryDirectory directory;
+  ::chmod(directory.write("ifcfg-eth0", kFile).c_str(), 0600);
+  SettingsLock lock(directory.path(), Access::Change);
+  lock.keepAside("eth0");
+  struct stat status {};
+  ASSERT_EQ(::stat((directory / "settings.before").c_str(), &status), 0);
+  EXPECT_EQ(status.st_mode & 0777U, 0600U);
+}
+
+/// Leaves the data directory as a process does that is killed when the file has become that text.
+void dieAfter(const TemporaryDirectory& directory, const std::string& text) {
+  directory.write("ifcfg-eth0", kFile);
+  const pid_t child = testing::startChild([&] {
+    SettingsLock lock(directory.path(), Access::Change);
+    lock.keepAside("eth0");
+    directory.write("ifcfg-eth0", text);
+    ::_exit(0);
+    return true;
+  });
+  ASSERT_TRUE(testing::succeeded(child));
+  ASSERT_EQ(contentsOf(directory / "settings.lock"), "eth0");
+}
+
+TEST(SettingsLock, WhoTakesItNextPutsBackWhatAKilledProcessLeft) {
+  for (const Access access : {Access::Read, Access::Change}) {
+    const TemporaryDirectory directory;
+    dieAfter(directory, "HOSTNAME=ne");
+    const SettingsLock lock(directory.path(), access);
+    EXPECT_EQ(contentsOf(directory / "ifcfg-eth0"), kFile);
+    EXPECT_FALSE(std::filesystem::exists(directory / "settings.before"));
+    EXPECT_EQ(contentsOf(directory / "settings.lock"), "");
+  }
+}
+
+TEST(SettingsLock, AChangeThatWasWholeWhenItsProcessWasKilledStays) {
+  const TemporaryDirectory directory;
+  dieAfter(directory, "HOSTNAME=new\nDOMAINNAME=example.org\nMTU=1500\n");
+  const SettingsLock lock(directory.path(), Access::Read);
+  EXPECT_THAT(contentsOf(directory / "ifcfg-eth0"), HasSubstr("HOSTNAME=new\n"));
+}
+
+TEST(SettingsLock, ALockFileWithNonsenseInItHarmsNobody) {
+  const TemporaryDirectory directory;
+  directory.write("settings.before", kFile);
+  directory.write("ifcfg-eth0", "");
+  for (const std::string& text : {std::string("../x"), std::string(4000, 'x'), std::string("a\0b", 3)}) {
+    directory.write("settings.lock", text);
+    const SettingsLock lock(directory.path(), Access::Change);
+    EXPECT_EQ(contentsOf(directory / "settings.lock"), "");
+    EXPECT_EQ(contentsOf(directory / "ifcfg-eth0"), "");
+  }
+}
+
+TEST(SettingsLock, AFileBehindALinkIsPutBackWhereItIs) {
+  const TemporaryDirectory directory;
+  directory.write("elsewhere/file", kFile);
+  directory.link(directory / "elsewhere/file", "ifcfg-eth0");
+  SettingsLock lock(directory.path(), Access::Change);
+  lock.keepAside("eth0");
+  directory.write("elsewhere/file", "HOST");
+  EXPECT_NE(lock.finish(), "");
+  EXPECT_EQ(contentsOf(directory / "elsewhere/file"), kFile);
+  EXPECT_TRUE(std::filesystem::is_symlink(directory / "ifcfg-eth0"));
+}
+
+}  // namespace
+}  // namespace zorvagent

@@ -1,0 +1,111 @@
+#include "frontend/SettingsClaims.h"
+
+#include <algorithm>
+#include <iterator>
+#include <utility>
+
+#include "agent/Agent.h"
+#include "schema/Names.h"
+
+namespace zorva::frontend {
+
+namespace {
+
+using broker::Access;
+
+// The classes whose providers read interface files: the settings, and the associations that walk them.
+constexpr const char* kReadsFiles[] = {kSettingClass,
+                                       kGeneralSettingClass,
+                                       "ZORVA_DNSGeneralElementSettingData",
+                                       "ZORVA_DNSGenEndPointElementSettingData",
+                                       "ZORVA_DNSEndPointElementSettingData",
+                                       "ZORVA_DNSGenOrderedComponent",
+                                       "ZORVA_DNSOrderedComponent"};
+constexpr const char* kChanges[] = {kSettingClass, kGeneralSettingClass, kEndpointClass};
+
+bool isNamed(std::string_view className, const char* const* first, const char* const* last) {
+  return std::any_of(first, last, [className](const char* each) { return schema::sameName(each, className); });
+}
+
+bool needsClaim(Access access, std::string_view className) {
+  if (access == Access::Read) return isNamed(className, std::begin(kReadsFiles), std::end(kReadsFiles));
+  return isNamed(className, std::begin(kChanges), std::end(kChanges));
+}
+
+/// Empty where the change goes to no file.
+std::string interfaceOfFile(const broker::ObjectPath& changed) {
+  if (schema::sameName(changed.className, kGeneralSettingClass)) {
+    return interfaceOfHostSettings(*zorvagent::currentTree()).value_or("");
+  }
+  if (!schema::sameName(changed.className, kSettingClass)) return {};
+  const broker::Value* id = changed.key("InstanceID");
+  return id == nullptr ? std::string() : interfaceOfId(id->asText());
+}
+
+using LockPointer = std::shared_ptr<zorvagent::SettingsLock>;
+
+LockPointer takeLock(Access access) {
+  return std::make_shared<zorvagent::SettingsLock>(
+      zorvagent::dataDirectory(), access == Access::Change ? zorvagent::Access::Change : zorvagent::Access::Read);
+}
+
+class LockClaim : public broker::Claim {
+ public:
+  explicit LockClaim(LockPointer lock) : lock_(std::move(lock)) {}
+
+  broker::Status finish() override {
+    const std::string problem = lock_->finish();
+    return problem.empty() ? broker::Status() : broker::Status{1, problem};  // CIM_ERR_FAILED
+  }
+
+ private:
+  const LockPointer lock_;
+};
+
+}  // namespace
+
+struct SettingsClaims::State {
+  LockPointer held;  // of a program that has taken the lock itself
+};
+
+SettingsClaims::SettingsClaims() : state_(std::make_shared<State>()) {}
+
+broker::ClaimHook SettingsClaims::hook() const {
+  return [state = state_](Access access, std::string_view className, const broker::ObjectPath* changed) {
+    std::unique_ptr<broker::Claim> claim;
+    const bool changes = access == Access::Change;
+    if (!needsClaim(access, className) || (state->held != nullptr && !changes)) return claim;
+    const LockPointer lock = state->held != nullptr ? state->held : takeLock(access);
+    const std::string interface = changed == nullptr ? std::string() : interfaceOfFile(*changed);
+    if (!interface.empty()) lock->keepAside(interface);
+    claim = std::make_unique<LockClaim>(lock);
+    return claim;
+  };
+}
+
+SettingsClaims::Hold::Hold(const SettingsClaims& claims) {
+  if (claims.state_->held != nullptr) return;
+  claims.state_->held = takeLock(Access::Change);
+  state_ = claims.state_;
+}
+
+SettingsClaims::Hold::~Hold() {
+  if (state_ != nullptr) state_->held = nullptr;
+}
+
+std::string interfaceOfId(std::string_view instanceId) {
+  const std::size_t percent = instanceId.find('%');
+  return percent == std::string_view::npos ? std::string() : std::string(instanceId.substr(percent + 1));
+}
+
+std::optional<std::string> interfaceOfHostSettings(const zorvagent::TreeSnapshot& tree) {
+  for (const zorvagent::Node& node : tree.nodes()) {
+    if (node.type() != zorvagent::NodeType::NetworkIPConfig) continue;
+    if (tree.parent(tree.parent(node)).description() == "BMC") continue;
+    const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
+    return name == nullptr ? std::string() : *name;
+  }
+  return std::nullopt;
+}
+
+}  // namespace zorva::frontend
