@@ -70,8 +70,7 @@ std::string DNSGeneralSettingData::getFileName() const {
 bool DNSGeneralSettingData::getConfigurationName(std::string& value) const {
   const std::string fileName = getFileName();
   if (!interfaceFileExists(fileName)) return false;
-  value = readScalar(fileName, "CONFIG_NAME");
-  logVariable(loggerDNSGeneralSettingData, ZV_HERE, "configurationName", value);
+  value = readScalar(fileName, "CONFIG_NAME", loggerDNSGeneralSettingData, ZV_HERE, "configurationName");
   return true;
 }
 

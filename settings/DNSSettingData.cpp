@@ -55,12 +55,6 @@ bool DNSSettingData::getAddressOrigin(unsigned short& value) const {
 
 namespace {
 
-void readLoggedScalar(const std::string& fileName, const char* key, const LogSite& site, const char* name,
-                      std::string& value) {
-  value = readScalar(fileName, key);
-  logVariable(loggerDNSSettingData, site, name, value);
-}
-
 // Empty where the node has no such property.
 template <typename Value>
 bool readProperty(const Instrumentation& node, NodeLexicon::Properties property, Value& value) {
@@ -72,25 +66,25 @@ bool readProperty(const Instrumentation& node, NodeLexicon::Properties property,
 
 bool DNSSettingData::getBootProtocol(std::string& value) const {
   if (!interfaceFileExists(fileName)) return false;
-  readLoggedScalar(fileName, "BOOTPROTO", ZV_HERE, "bootProtocol", value);
+  value = readScalar(fileName, "BOOTPROTO", loggerDNSSettingData, ZV_HERE, "bootProtocol");
   return true;
 }
 
 bool DNSSettingData::getDomainName(std::string& value) const {
   if (!interfaceFileExists(fileName)) return readProperty(*this, NodeLexicon::PROP_DOMAIN_NAME, value);
-  readLoggedScalar(fileName, "DOMAINNAME", ZV_HERE, "domainName", value);
+  value = readScalar(fileName, "DOMAINNAME", loggerDNSSettingData, ZV_HERE, "domainName");
   return true;
 }
 
 bool DNSSettingData::getRequestedHostname(std::string& value) const {
   if (!interfaceFileExists(fileName)) return readProperty(*this, NodeLexicon::PROP_HOST_NAME, value);
-  readLoggedScalar(fileName, "HOSTNAME", ZV_HERE, "requestedHostname", value);
+  value = readScalar(fileName, "HOSTNAME", loggerDNSSettingData, ZV_HERE, "requestedHostname");
   return true;
 }
 
 bool DNSSettingData::getConfigurationName(std::string& value) const {
   if (!interfaceFileExists(fileName)) return false;
-  readLoggedScalar(fileName, "CONFIG_NAME", ZV_HERE, "configurationName", value);
+  value = readScalar(fileName, "CONFIG_NAME", loggerDNSSettingData, ZV_HERE, "configurationName");
   return true;
 }
 

@@ -10,8 +10,7 @@
 #include <filesystem>
 #include <memory>
 #include <system_error>
-
-#include "trace/Trace.h"
+#include <utility>
 
 namespace ZV {
 
@@ -23,32 +22,41 @@ bool interfaceFileExists(const std::string& fileName) { return File::exists(make
 
 namespace {
 
-// A reader that did not open has no keys, so its value is the empty text too.
-std::string readValue(const std::string& fileName, const char* key) {
+// Hands the value of a key to take while the reader is open. A reader that did not open has no keys, so its value is
+// the empty text too.
+template <typename Take>
+void readValue(const std::string& fileName, const char* key, Take take) {
   PropertyFile file{File::Path(fileName)};
   file.open(1);
-  std::string value = make_string(file.getValue(make_wstring(key)));
+  take(make_string(file.getValue(make_wstring(key))));
   file.close();
-  return value;
+}
+
+void split(const std::string& text, std::vector<std::string>& values) {
+  std::size_t start = text.find_first_not_of(' ');
+  while (start != std::string::npos) {
+    const std::size_t end = text.find(' ', start);
+    values.push_back(text.substr(start, end - start));
+    start = text.find_first_not_of(' ', end);
+  }
 }
 
 }  // namespace
 
-std::string readScalar(const std::string& fileName, const char* key) {
-  std::string value = readValue(fileName, key);
-  const std::size_t last = value.find_last_not_of('\n');
-  if (last != std::string::npos) value.erase(last + 1);
+std::string readScalar(const std::string& fileName, const char* key, const std::string& logger, const LogSite& site,
+                       const char* name) {
+  std::string value;
+  readValue(fileName, key, [&](std::string read) {
+    value = std::move(read);
+    const std::size_t last = value.find_last_not_of('\n');
+    if (last != std::string::npos) value.erase(last + 1);
+    logVariable(logger, site, name, value);
+  });
   return value;
 }
 
 void readList(const std::string& fileName, const char* key, std::vector<std::string>& values) {
-  const std::string value = readValue(fileName, key);
-  std::size_t start = value.find_first_not_of(' ');
-  while (start != std::string::npos) {
-    const std::size_t end = value.find(' ', start);
-    values.push_back(value.substr(start, end - start));
-    start = value.find_first_not_of(' ', end);
-  }
+  readValue(fileName, key, [&values](const std::string& read) { split(read, values); });
 }
 
 namespace {

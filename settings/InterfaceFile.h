@@ -5,6 +5,8 @@
 #include <string>
 #include <vector>
 
+#include "trace/Trace.h"
+
 namespace ZV {
 
 extern const std::string loggerDNSSettingData;
@@ -14,9 +16,12 @@ std::string interfaceFileName(const std::string& interfaceName);
 
 bool interfaceFileExists(const std::string& fileName);
 
-// The value of a key in a file that exists, without line feeds at its end; a value of line feeds alone stays as it is.
-// A missing key gives the empty text. readList splits the value at blanks and appends to values.
-std::string readScalar(const std::string& fileName, const char* key);
+// The value of a key in a file that exists; a missing key gives the empty text.
+//
+// readScalar takes away the line feeds at the value's end, but leaves a value of line feeds alone as it is. It logs the
+// value under that name while the file is open. readList splits the value at blanks and appends to values.
+std::string readScalar(const std::string& fileName, const char* key, const std::string& logger, const LogSite& site,
+                       const char* name);
 void readList(const std::string& fileName, const char* key, std::vector<std::string>& values);
 
 // Write a value under a key into an existing file. Every line in which the key occurs anywhere becomes "key=value", a

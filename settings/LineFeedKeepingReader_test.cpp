@@ -7,6 +7,8 @@
 #include <fstream>
 
 #include "World.h"
+#include "agent/Seams.h"
+#include "settings/DNSGeneralSettingData.h"
 #include "settings/DNSSettingData.h"
 
 namespace ZV {
@@ -89,6 +91,35 @@ TEST_F(LineFeedKeepingReader, IsOpenedForReadingAndClosedBeforeItEnds) {
   EXPECT_THAT(calls, ElementsAre("open 1", "getValue DOMAINNAME", "close", "end"));
   servers("DNSSERVERS=a\n");
   EXPECT_THAT(calls, ElementsAre("open 1", "getValue DNSSERVERS", "close", "end"));
+}
+
+// Writes the lines of the log among the calls of the reader.
+class LogAmongCalls : private zorvagent::LogSink {
+ public:
+  LogAmongCalls() { zorvagent::setLogSink(this); }
+  ~LogAmongCalls() override { zorvagent::setLogSink(nullptr); }
+  LogAmongCalls(const LogAmongCalls&) = delete;
+  LogAmongCalls& operator=(const LogAmongCalls&) = delete;
+
+ private:
+  void record(const zorvagent::LogCall& call) override {
+    if (call.stream == zorvagent::LogStream::Log) calls.push_back(call.message.substr(0, call.message.find(" at ")));
+  }
+};
+
+TEST_F(LineFeedKeepingReader, LogsAScalarBeforeItIsClosed) {
+  DNSSettingData data = with("DOMAINNAME=a\nCONFIG_NAME=b\n");
+  DNSGeneralSettingData general;
+  ASSERT_TRUE(static_cast<bool>(general));
+  const LogAmongCalls log;
+  std::string value;
+  data.getDomainName(value);
+  EXPECT_THAT(calls,
+              ElementsAre("open 1", "getValue DOMAINNAME", "VARIABLE: 'domainName' has Value 'a'", "close", "end"));
+  calls.clear();
+  general.getConfigurationName(value);
+  EXPECT_THAT(calls, ElementsAre("open 1", "getValue CONFIG_NAME", "VARIABLE: 'configurationName' has Value 'b'",
+                                 "close", "end"));
 }
 
 }  // namespace
