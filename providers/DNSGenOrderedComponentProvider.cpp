@@ -1,6 +1,8 @@
 // ZORVA_DNSGenOrderedComponent: the host-wide DNS settings as a component of each IP assignment setting. Instance and
 // association provider; the IP assignment settings are served elsewhere and asked for through the broker. No key
 // decides what belongs together.
+#include <stdexcept>
+
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSGeneralSettingDataObjects.h"
 #include "providers/AssociationSteps.h"
@@ -16,8 +18,14 @@ static const char* const ipAssignmentSettingDataClass = "ZORVA_IPAssignmentSetti
 
 static constexpr CMPIUint64 kAssignedSequence = 1;  // the interface's own settings come second
 
-// Without host-wide settings, and with an IP assignment to pair them with, std::out_of_range leaves this function and
-// the provider: nothing tests the count first, and a server tells its client that the operation failed.
+// Throws out of range where there are none; the provider lets that pass, and a server reports a failed operation with
+// this text.
+static CMPIObjectPath* firstOf(const std::vector<CMPIObjectPath*>& settings) {
+  if (settings.empty()) throw std::out_of_range("vector::_M_range_check");
+  return settings.front();
+}
+
+// Without host-wide settings, and with an IP assignment to pair them with, std::out_of_range leaves this function.
 static unsigned short DNSGeneralOrderedComponentCMPIInstances(const CMPIObjectPath* ref, const char** properties,
                                                               const CMPIContext* context,
                                                               std::vector<CMPIInstance*>& instances) {
@@ -45,7 +53,7 @@ static unsigned short DNSGeneralOrderedComponentCMPIInstances(const CMPIObjectPa
   while (hasNext(assignments, &status)) {
     const CMPIObjectPath* assignment = nextPath(assignments, &status);
     keyText(assignment, "InstanceID", &status);  // read, as the other below, and compared with nothing
-    CMPIObjectPath* setting = settings.at(0);
+    CMPIObjectPath* setting = firstOf(settings);
     if (isMissing(setting, loggerDNSGeneralOrderedComponent, ZV_HERE, "CMPIObjectPath is NULL for DNS Client")) {
       return 1;
     }
