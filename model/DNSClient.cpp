@@ -151,7 +151,7 @@ void addClient(const Instrumentation& cursor, const LogSite& site, std::map<std:
   if (cursor.getProperty(NodeLexicon::PROP_DNS_SUFFIXES, suffixes)) {
     warnUnless(client.setDNSSuffixesToAppend(suffixes), site, "Failed while setting DNSSuffixesToAppend");
   }
-  client.setDNSSCCN(systemClassOf(cursor, site));
+  warnUnless(client.setDNSSCCN(systemClassOf(cursor, site)), site, "Failed while setting System Creation Class Name");
   dnsClientMap[key] = client;  // the last node of a name wins
 }
 

@@ -25,16 +25,20 @@ bool firstTokenEquals(const std::string& ipName, const std::string& dnsName) {
   return !tokens.empty() && tokens.front() == dnsName;
 }
 
-// The DNS endpoint of an IP endpoint's whole name; null where the path has no name or no endpoint has it.
-CMPIInstance* endpointOf(DNSClientObjFactory& factory, const CMPIObjectPath* ref, const CMPIObjectPath* ipEndpoint,
-                         bool isObjPath, const char** properties, CMPIStatus* status) {
-  CMPIInstance* endpoint = nullptr;
+// Looks for the DNS endpoint of an IP endpoint's whole name: null where the path has no name or no endpoint has it.
+// False, with a line to the log, where the look-up fails.
+bool findEndpoint(DNSClientObjFactory& factory, const CMPIObjectPath* ref, const CMPIObjectPath* ipEndpoint,
+                  bool isObjPath, const char** properties, const LogSite& site, CMPIInstance*& endpoint,
+                  CMPIStatus* status) {
+  endpoint = nullptr;
   const CMPIString* name = stringOf(getKey(ipEndpoint, "Name", status));
-  if (isGood(name)) {
-    factory.getDNSClientCMPIInstanceFromIPInterface(broker, ref, textOf(name, status), endpoint, isObjPath, properties,
-                                                    status);
+  if (!isGood(name)) return true;
+  if (factory.getDNSClientCMPIInstanceFromIPInterface(broker, ref, textOf(name, status), endpoint, isObjPath,
+                                                      properties, status) == 0) {
+    return true;
   }
-  return endpoint;
+  logError(loggerDNSSAPDependency, site, "getDNSClientCMPIInstanceFromIPInterface Failed");
+  return false;
 }
 
 }  // namespace
@@ -57,7 +61,8 @@ static unsigned short DNSSAPSAPDependencyCMPIInstances(const CMPIObjectPath* ref
   }
   while (hasNext(ipEndpoints, &status)) {
     const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &status);
-    const CMPIInstance* endpoint = endpointOf(factory, ref, ipEndpoint, false, properties, &status);
+    CMPIInstance* endpoint = nullptr;
+    if (!findEndpoint(factory, ref, ipEndpoint, false, properties, ZV_HERE, endpoint, &status)) return 1;
     if (!isGood(endpoint)) continue;
     CMPIObjectPath* endpointPath = objectPathOf(endpoint, &status);
     if (isMissing(endpointPath, loggerDNSSAPDependency, ZV_HERE, "CMPIObjectPath is NULL for DNS Client")) return 1;
@@ -96,7 +101,8 @@ static CMPIStatus DNSSAPSAPDependency_EnumInstanceNames(CMPIInstanceMI*, const C
   }
   while (hasNext(ipEndpoints, &status)) {
     const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &status);
-    const CMPIInstance* endpoint = endpointOf(factory, ref, ipEndpoint, true, nullptr, &status);
+    CMPIInstance* endpoint = nullptr;
+    if (!findEndpoint(factory, ref, ipEndpoint, true, nullptr, ZV_HERE, endpoint, &status)) return status;
     if (!isGood(endpoint)) continue;
     CMPIObjectPath* endpointPath = objectPathOf(endpoint, &status);
     if (isMissing(endpointPath, loggerDNSSAPDependency, ZV_HERE, "CMPIObjectPath is NULL for DNS Client")) {
@@ -173,7 +179,8 @@ static CMPIStatus DNSSAPSAPDependency_Associators(CMPIAssociationMI*, const CMPI
     }
   } else if (farEndClass == dnsProtocolEndPointClass) {
     if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) return status;
-    const CMPIInstance* endpoint = endpointOf(factory, ref, ref, false, properties, &status);
+    CMPIInstance* endpoint = nullptr;
+    if (!findEndpoint(factory, ref, ref, false, properties, ZV_HERE, endpoint, &status)) return status;
     if (endpoint != nullptr) returnInstance(result, endpoint);
   }
   ZV_PROVIDER_EXIT(loggerDNSSAPDependency);
@@ -208,7 +215,8 @@ static CMPIStatus DNSSAPSAPDependency_AssociatorNames(CMPIAssociationMI*, const 
     }
   } else if (farEndClass == dnsProtocolEndPointClass) {
     if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) return status;
-    const CMPIInstance* endpoint = endpointOf(factory, ref, ref, true, nullptr, &status);
+    CMPIInstance* endpoint = nullptr;
+    if (!findEndpoint(factory, ref, ref, true, nullptr, ZV_HERE, endpoint, &status)) return status;
     if (endpoint != nullptr) returnObjectPath(result, objectPathOf(endpoint, &status));
   }
   ZV_PROVIDER_EXIT(loggerDNSSAPDependency);
