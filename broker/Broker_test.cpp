@@ -477,6 +477,29 @@ TEST_F(BrokerTest, ReferenceNamesHaveTheKeysOfTheInstance) {
   EXPECT_EQ(found[0].key("right")->type, schema::Type::Reference);
 }
 
+TEST_F(BrokerTest, ReferenceNamesAreFilteredByWhatTheClientAskedFor) {
+  std::vector<std::string> found;
+  const auto ask = [&](const std::string& resultClass) {
+    found.clear();
+    AssociationFilter filter;
+    filter.associationClass = resultClass;
+    status_ = broker_->referenceNames(path("T_Other.Name=\"sister\""), filter, [&](const ObjectPath& name) {
+      found.push_back(name.className);
+      return true;
+    });
+    EXPECT_EQ(status_.rc, 0);
+  };
+  ask("");  // the provider of T_ThingOther names the class of another association
+  EXPECT_THAT(found, ElementsAre("T_ThingTrouble"));
+  ask("T_Link");
+  EXPECT_THAT(found, ElementsAre("T_ThingTrouble"));
+  EXPECT_THAT(lines(), ::testing::Not(Contains(HasSubstr("dropped"))));
+  ask("T_ThingOther");
+  EXPECT_THAT(found, IsEmpty());
+  EXPECT_THAT(lines(), Contains("a provider returned objects of T_ThingTrouble, which is not T_ThingOther or below it; "
+                                "they were dropped"));
+}
+
 TEST_F(BrokerTest, UpCallsRunNestedAndTheirResultsStay) {
   EXPECT_THAT(names("T_Calling"),
               ElementsAre("root/cimv2:T_Calling.Name=\"of a\"", "root/cimv2:T_Calling.Name=\"of b\"",

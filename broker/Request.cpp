@@ -441,8 +441,9 @@ Status Request::referring(const PathObject& path, Form form, const FarEnd& filte
   status = findAssociations(*resolved, filter, false, associations, unused);
   if (!status.ok()) return status;
   ResultFilter results(core_, scope_, shape, nullptr, resolved->nameSpace->view(), taker);
+  // Not the class that the provider is asked for: one may name its associations by the class of a sister association.
+  if (!filter.associationClass.empty()) results.within = core_.classes().find(filter.associationClass);
   return askEach(associations, results, [&](const Association& one, CMPIAssociationMI* mi) {
-    results.within = one.info;
     const char* name = one.info->name().c_str();
     if (form == Form::Paths) {
       ResultObject result(core_, ResultObject::Paths, &results, one.entry->prefix);

@@ -36,12 +36,24 @@ bool ResultFilter::takePath(const PathObject& path) {
   return !full_;
 }
 
-bool ResultFilter::admits(const ClassInfo& info) const {
-  if (within != nullptr && &info != within && !info.isA(*within)) return false;
+bool ResultFilter::admits(const ClassInfo& info) {
+  if (within != nullptr && &info != within && !info.isA(*within)) {
+    logDrop(info, "which is not " + within->name() + " or below it");
+    return false;
+  }
   if (servedAs == nullptr || &info == servedAs) return true;
   const schema::Class* nearest = &info.declared();
   while (nearest != nullptr && !isServed(*nearest)) nearest = nearest->superclass();
-  return nearest == &servedAs->declared();
+  if (nearest == &servedAs->declared()) return true;
+  logDrop(info, "which were not asked for with " + servedAs->name());
+  return false;
+}
+
+void ResultFilter::logDrop(const ClassInfo& info, std::string_view why) {
+  if (std::find(logged_.begin(), logged_.end(), &info) != logged_.end()) return;
+  logged_.push_back(&info);
+  core_.log(LogLevel::Info,
+            "a provider returned objects of " + info.name() + ", " + std::string(why) + "; they were dropped");
 }
 
 bool ResultFilter::isServed(const schema::Class& declared) const {

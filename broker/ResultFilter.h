@@ -33,6 +33,7 @@ class Taker {
 };
 
 /// Lets pass what was asked for, each instance with the mask of its wanted properties, each name with its namespace.
+/// What it drops it logs.
 class ResultFilter : public Receiver {
  public:
   /// `requested`: the class that localOnly and deepInheritance are about; null where they do not apply. All that is
@@ -51,7 +52,9 @@ class ResultFilter : public Receiver {
   bool takePath(const PathObject& path) override;
 
  private:
-  bool admits(const ClassInfo& info) const;
+  bool admits(const ClassInfo& info);
+  /// One line for each class: a provider may return thousands.
+  void logDrop(const ClassInfo& info, std::string_view why);
   bool isServed(const schema::Class& declared) const;
   bool wants(const PropertyInfo& property) const;
   PropertyMask maskOf(const ClassInfo& info);
@@ -64,6 +67,7 @@ class ResultFilter : public Receiver {
   Taker& taker_;
   bool full_ = false;
   std::vector<std::pair<const ClassInfo*, std::vector<std::uint64_t>>> masks_;
+  std::vector<const ClassInfo*> logged_;
 };
 
 }  // namespace zorva::broker

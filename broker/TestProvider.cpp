@@ -379,7 +379,10 @@ CMPIStatus referenceNames(CMPIAssociationMI*, const CMPIContext*, const CMPIResu
                           const char* resultClass, const char* role) {
   note("ReferenceNames " + shown(path) + " " + shown(resultClass) + " " + shown(role));
   CMPIInstance* link = linkOf(path);
-  result->ft->returnObjectPath(result, link->ft->getObjectPath(link, nullptr));
+  CMPIObjectPath* name = link->ft->getObjectPath(link, nullptr);
+  // Some providers name their associations by the class of a sister association.
+  if (nameOf(path) == "sister") name->ft->setClassName(name, "T_ThingTrouble");
+  result->ft->returnObjectPath(result, name);
   return kOk;
 }
 
