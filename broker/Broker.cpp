@@ -151,7 +151,7 @@ Status Broker::createInstance(const Instance& instance, ObjectPath& created, con
 }
 
 Status Broker::modifyInstance(const Instance& instance, const std::optional<std::vector<std::string>>& propertyList,
-                              const Caller& caller) {
+                              const Caller& caller, std::vector<Property>* changes) {
   return inRequest(*core_, caller, 0, [&](Request& request) {
     PathObject* name = nullptr;
     InstanceObject* object = nullptr;
@@ -162,7 +162,7 @@ Status Broker::modifyInstance(const Instance& instance, const std::optional<std:
     if (!status.ok()) return status;
     Shape shape;
     shape.properties = viewsOf(propertyList);
-    status = request.modify(*name, *object, shape);
+    status = request.modify(*name, *object, shape, changes);
     return claim == nullptr ? status : claim->finish(std::move(status));
   });
 }

@@ -134,9 +134,14 @@ class Broker {
   /// `instance.path` names class and namespace. `created` gets the name of what was made.
   Status createInstance(const Instance& instance, ObjectPath& created, const Caller& caller = {});
 
-  /// `instance.path` names what is to be changed; `propertyList` what of it (absent: all that `instance` has).
+  /// `instance.path` names what is to be changed; `propertyList` what of it (absent: all that `instance` has). The
+  /// instance is read first: what the client does not name, or names with the value that it has, stays as it is, and
+  /// where that is all the provider is not called. Before anything is written, these are refused: a listed name that
+  /// the class lacks, and a key with another value than in the path (CIM_ERR_INVALID_PARAMETER); another value for a
+  /// property without the qualifier Write (CIM_ERR_NOT_SUPPORTED). `changes`, where it is not null, gets the properties
+  /// that the provider was asked to change, in the types that the schema declares.
   Status modifyInstance(const Instance& instance, const std::optional<std::vector<std::string>>& propertyList,
-                        const Caller& caller = {});
+                        const Caller& caller = {}, std::vector<Property>* changes = nullptr);
 
   Status deleteInstance(const ObjectPath& path, const Caller& caller = {});
 

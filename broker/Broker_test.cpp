@@ -303,7 +303,7 @@ TEST_F(BrokerTest, CreatesModifiesAndDeletes) {
   instance.path = path("T_Thing.Name=\"a\"");
   instance.properties.erase(instance.properties.begin());
   EXPECT_EQ(broker_->modifyInstance(instance, {{"SIZE"}}).rc, 0);
-  EXPECT_THAT(lines(), Contains("ModifyInstance root/cimv2:T_Thing.Name [Size] Size 9"));
+  EXPECT_THAT(lines(), Contains("ModifyInstance root/cimv2:T_Thing.Name [Size] Size 9 Labels x y"));
 
   EXPECT_EQ(broker_->deleteInstance(path("T_Thing.Name=\"a\"")).rc, 0);
   const Status refused = broker_->deleteInstance(path("T_Thing.Name=\"z\""));

@@ -47,11 +47,24 @@ constexpr BuiltIn kBuiltIn[] = {
     {"ZORVA_IPAssignmentSettingData", "HostIPAssignmentSettingDataProvider", kHostLibrary, InstanceMi},
 };
 
+/// ProviderEntry::keeps of the classes that can be modified. The setting data's provider empties a ConfigurationName
+/// that is missing.
+std::vector<std::string> keptBy(std::string_view className) {
+  if (className == "ZORVA_DNSProtocolEndPoint") return {"DNSSuffixesToAppend", "DomainName", "Hostname"};
+  if (className == "ZORVA_DNSSettingData") return {"RequestedHostname", "DomainName", "DNSServerAddresses"};
+  if (className == "ZORVA_DNSGeneralSettingData") return {"DNSSuffixesToAppend", "ConfigurationName"};
+  return {};
+}
+
 }  // namespace
 
 ProviderRegistry ProviderRegistry::builtIn() {
   ProviderRegistry registry;
-  for (const BuiltIn& row : kBuiltIn) registry.add({row.className, row.prefix, row.library, row.kinds});
+  for (const BuiltIn& row : kBuiltIn) {
+    ProviderEntry entry{row.className, row.prefix, row.library, row.kinds};
+    entry.keeps = keptBy(row.className);
+    registry.add(std::move(entry));
+  }
   return registry;
 }
 

@@ -23,6 +23,9 @@ struct ProviderEntry {
   std::string library;
   unsigned kinds = 0;  ///< MiKind bits
   std::string nameSpace = "root/cimv2";
+  /// The properties that the provider leaves as they are where a modification lacks them. All others may be lost then,
+  /// so it is handed their current values.
+  std::vector<std::string> keeps = {};
 };
 
 class ProviderRegistry {

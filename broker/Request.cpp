@@ -6,6 +6,7 @@
 #include <exception>
 
 #include "broker/Data.h"
+#include "broker/Modification.h"
 #include "broker/PathText.h"
 
 namespace zorva::broker {
@@ -300,18 +301,54 @@ Status Request::create(const PathObject& path, const InstanceObject& instance, T
   return status;
 }
 
-Status Request::modify(const PathObject& path, const InstanceObject& instance, const Shape& shape) {
+namespace {
+
+/// Keeps the instance.
+class CurrentTaker : public Taker {
+ public:
+  explicit CurrentTaker(Arena& arena) : arena_(arena) {}
+  bool takeInstance(const InstanceObject& instance, const PropertyMask& /*wanted*/) override {
+    current_ = copyInstance(arena_, instance);
+    return true;
+  }
+  bool takePath(const PathObject& /*path*/) override { return true; }
+  const InstanceObject* current() const noexcept { return current_; }
+
+ private:
+  Arena& arena_;
+  const InstanceObject* current_ = nullptr;
+};
+
+void listChanges(const Modification& modification, std::vector<Property>& changes) {
+  for (const PropertyInfo* property : modification.changed) {
+    Property& change = changes.emplace_back();
+    change.name = property->declared->name;
+    change.declaration = property->declared;
+    fillValue(modification.handed->find(*property)->data, change.value);
+  }
+}
+
+}  // namespace
+
+Status Request::modify(const PathObject& path, const InstanceObject& instance, const Shape& shape,
+                       std::vector<Property>* changes) {
   PathObject* resolved = nullptr;
   const ProviderEntry* entry = nullptr;
   const CMPIInstanceMI* mi = nullptr;
   Status status = findInstanceMi(path, "ModifyInstance", resolved, entry, mi);
   if (!status.ok()) return status;
-  InstanceObject* given = copyInstance(arena(), instance);
-  given->nameSpace = resolved->nameSpace;
+  CurrentTaker taker(arena());
+  status = get(*resolved, Shape(), taker);
+  // A provider that cannot be read is handed what the client gave.
+  if (!status.ok() && status.rc != CMPI_RC_ERR_NOT_SUPPORTED) return status;
+  Modification modification;
+  status = planModification(arena(), {*resolved, instance, taker.current(), shape, *entry}, modification);
+  if (!status.ok() || modification.changed.empty()) return status;
+  if (changes != nullptr) listChanges(modification, *changes);
   const char** list = providerList(shape, {resolved->info});
   ResultObject result(core_, ResultObject::Nothing, nullptr, entry->prefix);
   return call(result, *entry, "ModifyInstance", mi->ft->modifyInstance, const_cast<CMPIInstanceMI*>(mi), &context_,
-              &result, resolved, given, list);
+              &result, resolved, modification.handed, list);
 }
 
 Status Request::remove(const PathObject& path) {

@@ -48,7 +48,9 @@ class Request {
   Status enumerate(const PathObject& path, Form form, const Shape& shape, Taker& taker);
   Status get(const PathObject& path, const Shape& shape, Taker& taker);
   Status create(const PathObject& path, const InstanceObject& instance, Taker& taker);
-  Status modify(const PathObject& path, const InstanceObject& instance, const Shape& shape);
+  /// `changes`, where it is not null, gets what is changed.
+  Status modify(const PathObject& path, const InstanceObject& instance, const Shape& shape,
+                std::vector<Property>* changes = nullptr);
   Status remove(const PathObject& path);
   Status associated(const PathObject& path, Form form, const FarEnd& filter, const Shape& shape, Taker& taker);
   Status referring(const PathObject& path, Form form, const FarEnd& filter, const Shape& shape, Taker& taker);

@@ -102,6 +102,7 @@ const char* goodText(const std::string& slot, const std::string& parameter) {
   if (slot == "CMPIArgsFT.getArg") return "Text";
   if (slot == "CMPIBrokerEncFT.classPathIsA") return "T_Base";
   if (slot == "CMPIBrokerEncFT.isOfType") return "CMPIString";
+  if (slot == "CMPIBrokerFT.setProperty") return "Inner";  // a key cannot be changed
   if (slot == "CMPIObjectPathFT.getPropertyQualifier") return parameter == "pName" ? "Size" : "Values";
   if (parameter == "resultClass") return slot.find("eferenc") != std::string::npos ? "T_ThingOther" : "T_Other";
   static const std::map<std::string, const char*> texts = {{"ns", "root/cimv2"},

@@ -17,6 +17,7 @@ Qualifier Association : boolean = false, Scope(association), Flavor(DisableOverr
 Qualifier Override : string = null, Scope(property, reference, method), Flavor(EnableOverride, Restricted);
 Qualifier EmbeddedInstance : string = null, Scope(property, method, parameter);
 Qualifier Description : string = null, Scope(any), Flavor(EnableOverride, ToSubclass, Translatable);
+Qualifier Write : boolean = false, Scope(property);
 Qualifier MaxLen : uint32 = null, Scope(property, method, parameter);
 Qualifier Values : string[], Scope(property, method, parameter), Flavor(EnableOverride, ToSubclass, Translatable);
 Qualifier In : boolean = true, Scope(parameter), Flavor(DisableOverride, ToSubclass);
@@ -25,13 +26,13 @@ Qualifier Out : boolean = false, Scope(parameter), Flavor(DisableOverride, ToSub
 [Abstract] class T_Base { [Key, MaxLen(64)] string Name; };
 
 [Description("A thing")] class T_Thing : T_Base {
-  [Values {"small", "large"}] uint16 Size;
-  string Labels[];
+  [Write, Values {"small", "large"}] uint16 Size;
+  [Write] string Labels[];
   boolean Good; char16 Letter; datetime Since;
   uint8 Tiny; sint8 STiny; sint16 SSmall; uint32 Wide; sint32 SWide; uint64 Huge; sint64 SHuge;
   real32 Rough; real64 Ratio;
   uint16 Numbers[];
-  [EmbeddedInstance("T_Thing")] string Inner;
+  [Write, EmbeddedInstance("T_Thing")] string Inner;
   [Description("Says it again")] uint32 Echo([In, Description("What")] string Text, [In] uint16 Times,
                                              [In(false), Out] string Said, [In] T_Thing REF Target);
 };
@@ -41,7 +42,7 @@ class T_Trouble : T_Base { string Note; };
 class T_Calling : T_Base { string Note; };
 class T_Absent : T_Base { string Note; };
 class T_Unserved : T_Base { string Note; };
-class T_Two { [Key] string First; [Key] uint32 Second; string Note; };
+class T_Two { [Key] string First; [Key] uint32 Second; [Write] string Note; };
 class T_Keyless { string Note; };
 
 [Association, Abstract] class T_Link { [Key] T_Base REF Left; [Key] T_Base REF Right; };

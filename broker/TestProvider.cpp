@@ -84,7 +84,26 @@ CMPIInstance* instanceOf(const CMPIObjectPath* like, const char* className, cons
   return instance;
 }
 
-CMPIStatus cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) { return kOk; }
+// What of the thing "a" can be modified, until the broker ends.
+constexpr int kNoSize = -1;
+constexpr int kFirstSize = 7;
+std::atomic<int> sizeOfA = kFirstSize;
+
+CMPIStatus cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
+  sizeOfA = kFirstSize;
+  return kOk;
+}
+
+/// The thing "stubborn" takes every modification and stays as it is.
+CMPIInstance* thingOf(const CMPIObjectPath* path, const std::string& name, const char** properties) {
+  CMPIInstance* instance = instanceOf(path, "T_Thing", name, properties);
+  if (name != "a") return instance;
+  const int stored = sizeOfA;
+  const auto size = static_cast<CMPIUint16>(stored);
+  instance->ft->setProperty(instance, "Size", stored == kNoSize ? nullptr : reinterpret_cast<const CMPIValue*>(&size),
+                            CMPI_uint16);
+  return instance;
+}
 CMPIStatus associationCleanup(CMPIAssociationMI*, const CMPIContext*, CMPIBoolean) { return kOk; }
 CMPIStatus methodCleanup(CMPIMethodMI*, const CMPIContext*, CMPIBoolean) {
   return {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
@@ -124,9 +143,9 @@ CMPIStatus thing(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* 
   note("GetInstance " + shown(path) + " " + shown(properties) + " by " +
        ((principal.state & CMPI_nullValue) == 0 ? text(principal.value.string) : "nobody"));
   const std::string name = nameOf(path);
-  if (name != "a" && name != "b") return kOk;
+  if (name != "a" && name != "b" && name != "stubborn") return kOk;
   // This provider pays no heed to the property list: the broker must.
-  result->ft->returnInstance(result, instanceOf(path, "T_Thing", name, nullptr));
+  result->ft->returnInstance(result, thingOf(path, name, nullptr));
   return kOk;
 }
 
@@ -139,11 +158,24 @@ CMPIStatus create(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
   return kOk;
 }
 
+std::string labelsOf(const CMPIInstance* instance) {
+  const CMPIData labels = instance->ft->getProperty(instance, "Labels", nullptr);
+  if ((labels.state & CMPI_nullValue) != 0) return "";
+  std::string shows = " Labels";
+  const CMPICount count = labels.value.array->ft->getSize(labels.value.array, nullptr);
+  for (CMPICount i = 0; i < count; ++i) {
+    shows += " " + text(labels.value.array->ft->getElementAt(labels.value.array, i, nullptr).value.string);
+  }
+  return shows;
+}
+
 CMPIStatus modify(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath* path,
                   const CMPIInstance* instance, const char** properties) {
   const CMPIData size = instance->ft->getProperty(instance, "size", nullptr);
+  const bool hasSize = (size.state & CMPI_nullValue) == 0;
   note("ModifyInstance " + shown(path) + " " + shown(properties) + " Size " +
-       ((size.state & CMPI_nullValue) == 0 ? std::to_string(size.value.uint16) : "null"));
+       (hasSize ? std::to_string(size.value.uint16) : "null") + labelsOf(instance));
+  if (nameOf(path) == "a") sizeOfA = hasSize ? size.value.uint16 : kNoSize;
   return kOk;
 }
 

@@ -57,6 +57,34 @@ const Value* ObjectPath::key(std::string_view name) const noexcept {
   return found != keys.end() ? &found->value : nullptr;
 }
 
+namespace {
+
+bool isEmpty(const Scalar& scalar) noexcept {
+  const auto* text = std::get_if<std::string>(&scalar);
+  return text != nullptr ? text->empty() : std::holds_alternative<std::monostate>(scalar);
+}
+
+/// The elements that count; a value that is no list is one of itself.
+std::vector<const Scalar*> contentOf(const Value& value) {
+  std::vector<const Scalar*> content;
+  if (value.isNull) return content;
+  if (!value.isArray && !isEmpty(value.scalar)) content.push_back(&value.scalar);
+  for (const Scalar& element : value.elements) {
+    if (!isEmpty(element)) content.push_back(&element);
+  }
+  return content;
+}
+
+}  // namespace
+
+bool hasSameEffect(const Value& a, const Value& b) {
+  const std::vector<const Scalar*> one = contentOf(a);
+  const std::vector<const Scalar*> other = contentOf(b);
+  if (a.isArray != b.isArray && !one.empty()) return false;
+  return std::equal(one.begin(), one.end(), other.begin(), other.end(),
+                    [](const Scalar* x, const Scalar* y) { return *x == *y; });
+}
+
 const Value* Instance::property(std::string_view name) const noexcept {
   const auto found = std::find_if(properties.begin(), properties.end(),
                                   [name](const Property& property) { return schema::sameName(property.name, name); });

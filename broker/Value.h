@@ -74,6 +74,10 @@ struct Value {
   bool operator==(const Value&) const = default;
 };
 
+/// True where nobody can tell the two apart once they are set: null, the empty text and the list without texts are one,
+/// and elements without text do not count. Settings have no place for such differences.
+bool hasSameEffect(const Value& a, const Value& b);
+
 /// A value with its name: a key of a path, or a parameter of a method.
 struct NamedValue {
   std::string name;

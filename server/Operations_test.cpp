@@ -156,7 +156,7 @@ TEST_F(OperationsTest, ModifyInstanceHandsOnWhatIsToBeChanged) {
       ask("ModifyInstance", parameter("ModifiedInstance", modified) + text("IncludeQualifiers", "false") +
                                 names("PropertyList", {"size"}));
   EXPECT_THAT(response, HasSubstr("<IMETHODRESPONSE NAME=\"ModifyInstance\"></IMETHODRESPONSE>"));
-  EXPECT_THAT(service_.lines(), Contains("ModifyInstance root/cimv2:T_Thing.Name [Size] Size 9"));
+  EXPECT_THAT(service_.lines(), Contains("ModifyInstance root/cimv2:T_Thing.Name [Size] Size 9 Labels x y"));
 }
 
 TEST_F(OperationsTest, ModifyInstanceRefusesValuesAndPropertiesThatDoNotFit) {
@@ -192,9 +192,9 @@ TEST_F(OperationsTest, SetPropertyChangesOneProperty) {
   const std::string what = parameter("InstanceName", thing("a")) + text("PropertyName", "Size");
   EXPECT_THAT(ask("SetProperty", what + text("NewValue", "12")),
               HasSubstr("<IMETHODRESPONSE NAME=\"SetProperty\"></IMETHODRESPONSE>"));
-  EXPECT_THAT(service_.lines(), Contains("ModifyInstance root/cimv2:T_Thing.Name [Size] Size 12"));
+  EXPECT_THAT(service_.lines(), Contains("ModifyInstance root/cimv2:T_Thing.Name [Size] Size 12 Labels x y"));
   ask("SetProperty", what);
-  EXPECT_THAT(service_.lines(), Contains("ModifyInstance root/cimv2:T_Thing.Name [Size] Size null"));
+  EXPECT_THAT(service_.lines(), Contains("ModifyInstance root/cimv2:T_Thing.Name [Size] Size null Labels x y"));
   EXPECT_THAT(errorOf("SetProperty", what + text("NewValue", "many")), HasSubstr("13 T_Thing.Size"));
 }
 
