@@ -4,6 +4,7 @@
 #include <utility>
 
 #include "broker/BrokerCore.h"
+#include "broker/ControlCharacters.h"
 #include "broker/Convert.h"
 #include "broker/Data.h"
 #include "broker/Request.h"
@@ -143,6 +144,7 @@ Status Broker::createInstance(const Instance& instance, ObjectPath& created, con
     PathObject* name = nullptr;
     InstanceObject* object = nullptr;
     Status status = makePath(request.arena(), instance.path, true, name);
+    if (status.ok()) status = refuseControlCharacters(instance, std::nullopt);
     if (status.ok()) status = makeInstance(request.arena(), *name, instance, object);
     if (!status.ok()) return status;
     OneTaker taker(nullptr, &created);
@@ -156,6 +158,7 @@ Status Broker::modifyInstance(const Instance& instance, const std::optional<std:
     PathObject* name = nullptr;
     InstanceObject* object = nullptr;
     Status status = makePath(request.arena(), instance.path, true, name);
+    if (status.ok()) status = refuseControlCharacters(instance, propertyList);
     if (status.ok()) status = makeInstance(request.arena(), *name, instance, object);
     std::unique_ptr<HeldClaim> claim;
     if (status.ok()) status = request.claim(Access::Change, instance.path.className, &instance.path, claim);
@@ -250,6 +253,7 @@ Status Broker::invokeMethod(const ObjectPath& path, std::string_view method, con
     PathObject* name = nullptr;
     EntryList arguments;
     Status status = makePath(request.arena(), path, true, name);
+    if (status.ok()) status = refuseControlCharacters(input);
     if (status.ok()) status = makeArguments(request.arena(), *name, method, input, arguments);
     if (!status.ok()) return status;
     EntryList output;

@@ -140,6 +140,8 @@ class Broker {
   /// the class lacks, and a key with another value than in the path (CIM_ERR_INVALID_PARAMETER); another value for a
   /// property without the qualifier Write (CIM_ERR_NOT_SUPPORTED). `changes`, where it is not null, gets the properties
   /// that the provider was asked to change, in the types that the schema declares.
+  /// A control character other than tab in a text, here and in createInstance and invokeMethod, is
+  /// CIM_ERR_INVALID_PARAMETER.
   Status modifyInstance(const Instance& instance, const std::optional<std::vector<std::string>>& propertyList,
                         const Caller& caller = {}, std::vector<Property>* changes = nullptr);
 
