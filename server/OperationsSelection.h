@@ -9,10 +9,11 @@
 
 namespace zorva::server {
 
-/// IncludeQualifiers, IncludeClassOrigin, PropertyList and, where the operation has it, LocalOnly.
+/// IncludeQualifiers, IncludeClassOrigin, PropertyList and, where the operation has it, LocalOnly, which counts as
+/// false: it is deprecated (DSP0200 5.3.2.2), and with its default clients would miss what the class inherits.
 inline broker::Selection takeSelection(Arguments& arguments, bool hasLocalOnly) {
   broker::Selection selection;
-  if (hasLocalOnly) selection.localOnly = arguments.boolean("LocalOnly", true);
+  if (hasLocalOnly) arguments.boolean("LocalOnly", false);
   selection.includeQualifiers = arguments.boolean("IncludeQualifiers", false);
   selection.includeClassOrigin = arguments.boolean("IncludeClassOrigin", false);
   selection.propertyList = arguments.names("PropertyList");

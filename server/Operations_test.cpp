@@ -79,12 +79,15 @@ TEST_F(OperationsTest, EnumerateInstancesGivesNamedInstances) {
   EXPECT_THAT(response, Not(HasSubstr("<QUALIFIER")));
 }
 
-TEST_F(OperationsTest, LocalOnlyLeavesOutWhatTheClassInherits) {
-  const std::string local = ask("EnumerateInstances", className("ClassName", "T_Thing"));
-  EXPECT_THAT(local, Not(HasSubstr("<PROPERTY NAME=\"Name\"")));
-  EXPECT_THAT(local, HasSubstr("<PROPERTY NAME=\"Size\""));
-  const std::string all = ask("GetInstance", parameter("InstanceName", thing("a")) + text("LocalOnly", "FALSE"));
-  EXPECT_THAT(all, HasSubstr("<PROPERTY NAME=\"Name\""));
+TEST_F(OperationsTest, LocalOnlyCountsAsFalseWhateverIsSent) {
+  for (const std::string& localOnly : {std::string(), text("LocalOnly", "true"), text("LocalOnly", "false")}) {
+    SCOPED_TRACE(localOnly);
+    for (const std::string& response : {ask("EnumerateInstances", className("ClassName", "T_Thing") + localOnly),
+                                        ask("GetInstance", parameter("InstanceName", thing("a")) + localOnly)}) {
+      EXPECT_THAT(response, HasSubstr("<PROPERTY NAME=\"Name\"")) << "inherited from T_Base";
+      EXPECT_THAT(response, HasSubstr("<PROPERTY NAME=\"Size\""));
+    }
+  }
 }
 
 TEST_F(OperationsTest, WithoutDeepInheritanceThereAreNoPropertiesOfSubclasses) {
