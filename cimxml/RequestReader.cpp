@@ -4,6 +4,7 @@
 #include <charconv>
 #include <cstring>
 #include <pugixml.hpp>
+#include <set>
 
 #include "schema/Names.h"
 #include "schema/Utf8.h"
@@ -16,8 +17,8 @@ using pugi::xml_node;
 
 // How deep embedded instances may lie within one another, each a text of its own within the other's.
 constexpr int kDeepestEmbedded = 8;
-// More attributes on an element than this are no request; it bounds the search for duplicates.
-constexpr std::size_t kMostAttributes = 32;
+// After so many steps the reader asks whether its time is over.
+constexpr unsigned kStepsBetweenLooks = 256;
 
 /// Leaves the reading; readRequest makes a RequestError of it.
 struct Refusal {
@@ -29,6 +30,23 @@ struct Refusal {
 [[noreturn]] void refuse(xml_node node, std::string message, Fault fault = Fault::NotLooselyValid) {
   throw Refusal{fault, node.offset_debug(), std::move(message)};
 }
+
+/// What holds for the reading of one request, embedded instances included.
+class Reading {
+ public:
+  explicit Reading(const ReaderLimits& most) : limits(most) {}
+
+  /// To be called for each element, so that the reading ends soon after its time is over.
+  void step() {
+    if (++steps_ % kStepsBetweenLooks != 0 || !limits.xml.isOver || !limits.xml.isOver()) return;
+    throw Refusal{Fault::TimeIsOver, -1, kTimeIsOver};
+  }
+
+  const ReaderLimits& limits;
+
+ private:
+  unsigned steps_ = 0;
+};
 
 bool is(xml_node node, const char* name) noexcept { return std::strcmp(node.name(), name) == 0; }
 
@@ -45,11 +63,44 @@ std::string quoted(std::string_view text) {
 
 std::string elementName(xml_node node) { return node ? node.name() : "nothing"; }
 
+/// Counts what an element repeats, and refuses one too many.
+class Count {
+ public:
+  Count(std::size_t most, const char* what) : most_(most), what_(what) {}
+
+  /// `node` is one more, within `outer`.
+  void add(xml_node node, xml_node outer) {
+    if (++count_ <= most_) return;
+    refuse(node, std::string(outer.name()) + " has more than " + std::to_string(most_) + " " + what_);
+  }
+
+ private:
+  const std::size_t most_;
+  const char* const what_;
+  std::size_t count_ = 0;
+};
+
+/// Names that may stand only once in one element.
+class UniqueNames {
+ public:
+  /// `name` lives as long as this.
+  void add(xml_node node, const char* what, std::string_view name) {
+    if (!names_.insert(name).second) refuse(node, std::string("the ") + what + " " + quoted(name) + " stands twice");
+  }
+
+ private:
+  // An order, not a hash: whoever knows the hash could choose names that collide.
+  std::set<std::string_view, schema::NameLess> names_;
+};
+
 /// The value of an attribute that must be there.
-std::string_view attribute(xml_node node, const char* name) {
+std::string_view attribute(const Reading& reading, xml_node node, const char* name) {
   const pugi::xml_attribute found = node.attribute(name);
   if (!found) refuse(node, std::string(node.name()) + " lacks the attribute " + name);
-  return found.value();
+  const std::string_view value = found.value();
+  if (value.size() <= reading.limits.nameBytes) return value;
+  refuse(node, std::string(node.name()) + " has the attribute " + name + " with more than " +
+                   std::to_string(reading.limits.nameBytes) + " bytes");
 }
 
 /// The first child element of one of these names; an element that is none of them is passed over.
@@ -85,24 +136,15 @@ std::string_view trimmed(std::string_view text) noexcept {
   return text.substr(begin, text.find_last_not_of(kBlanks) - begin + 1);
 }
 
-/// Parses a text that is known to be within the limits. `document` refers to `buffer`.
-void parse(std::string_view text, const XmlLimits& limits, std::string& buffer, pugi::xml_document& document) {
-  if (auto problem = checkXml(text, limits)) {
-    throw Refusal{Fault::NotWellFormed, static_cast<std::ptrdiff_t>(problem->position), std::move(problem->message)};
-  }
-  buffer.assign(text);
-  constexpr unsigned kFlags = pugi::parse_cdata | pugi::parse_escapes | pugi::parse_eol | pugi::parse_wconv_attribute |
-                              pugi::parse_ws_pcdata_single;
-  const pugi::xml_parse_result result =
-      document.load_buffer_inplace(buffer.data(), buffer.size(), kFlags, pugi::encoding_utf8);
-  if (!result) throw Refusal{Fault::NotWellFormed, result.offset, result.description()};
-}
-
-/// XML wants each attribute of an element to have a name of its own.
-void checkAttributes(xml_node node) {
+/// XML requires that each attribute of an element has a name of its own.
+void checkAttributes(const Reading& reading, xml_node node) {
   std::size_t count = 0;
+  for (pugi::xml_attribute one = node.first_attribute(); one; one = one.next_attribute()) {
+    if (++count <= reading.limits.attributes) continue;
+    refuse(node,
+           std::string(node.name()) + " has more than " + std::to_string(reading.limits.attributes) + " attributes");
+  }
   for (const pugi::xml_attribute one : node.attributes()) {
-    if (++count > kMostAttributes) refuse(node, std::string(node.name()) + " has too many attributes");
     for (pugi::xml_attribute other = one.next_attribute(); other; other = other.next_attribute()) {
       if (std::strcmp(one.name(), other.name()) == 0) {
         refuse(node, std::string(node.name()) + " has the attribute " + one.name() + " twice", Fault::NotWellFormed);
@@ -113,17 +155,39 @@ void checkAttributes(xml_node node) {
 
 class AttributeWalk : public pugi::xml_tree_walker {
  public:
+  explicit AttributeWalk(Reading& reading) : reading_(reading) {}
+
   bool for_each(xml_node& node) override {
-    checkAttributes(node);
+    reading_.step();
+    checkAttributes(reading_, node);
     return true;
   }
+
+ private:
+  Reading& reading_;
 };
 
-broker::Instance readInstance(xml_node node, const XmlLimits& limits, int nesting);
-broker::ObjectPath readReference(xml_node node);
+/// Checks a text and parses it. `document` refers to `buffer`.
+void parse(std::string_view text, Reading& reading, std::string& buffer, pugi::xml_document& document) {
+  if (auto problem = checkXml(text, reading.limits.xml)) {
+    if (problem->isOver) throw Refusal{Fault::TimeIsOver, -1, std::move(problem->message)};
+    throw Refusal{Fault::NotWellFormed, static_cast<std::ptrdiff_t>(problem->position), std::move(problem->message)};
+  }
+  buffer.assign(text);
+  constexpr unsigned kFlags = pugi::parse_cdata | pugi::parse_escapes | pugi::parse_eol | pugi::parse_wconv_attribute |
+                              pugi::parse_ws_pcdata_single;
+  const pugi::xml_parse_result result =
+      document.load_buffer_inplace(buffer.data(), buffer.size(), kFlags, pugi::encoding_utf8);
+  if (!result) throw Refusal{Fault::NotWellFormed, result.offset, result.description()};
+  AttributeWalk walk(reading);
+  document.traverse(walk);
+}
+
+broker::Instance readInstance(xml_node node, Reading& reading, int nesting);
+broker::ObjectPath readReference(xml_node node, Reading& reading);
 
 /// The instance whose element stands, as text, in a value (DSP0201 5.3.2). Empty texts are null.
-broker::Scalar readEmbedded(xml_node place, const std::string& text, const XmlLimits& limits, int nesting) {
+broker::Scalar readEmbedded(xml_node place, const std::string& text, Reading& reading, int nesting) {
   if (trimmed(text).empty()) return {};
   if (nesting >= kDeepestEmbedded) {
     refuse(place, "instances embedded deeper than " + std::to_string(kDeepestEmbedded));
@@ -131,12 +195,12 @@ broker::Scalar readEmbedded(xml_node place, const std::string& text, const XmlLi
   std::string buffer;
   pugi::xml_document document;
   try {
-    parse(text, limits, buffer, document);
+    parse(text, reading, buffer, document);
     const xml_node root = document.document_element();
     if (!is(root, "INSTANCE")) {
       refuse(place, "the embedded object is " + elementName(root) + ", where INSTANCE is taken");
     }
-    return broker::Boxed<broker::Instance>(readInstance(root, limits, nesting + 1));
+    return broker::Boxed<broker::Instance>(readInstance(root, reading, nesting + 1));
   } catch (Refusal& inner) {
     refuse(place, "in the embedded instance: " + inner.message, inner.fault);
   }
@@ -178,8 +242,8 @@ broker::Scalar numberOf(std::string_view text) {
   return std::string(text);
 }
 
-broker::Scalar scalarOf(xml_node place, std::string text, const ValueKind& kind, const XmlLimits& limits, int nesting) {
-  if (kind.isEmbedded) return readEmbedded(place, text, limits, nesting);
+broker::Scalar scalarOf(xml_node place, std::string text, const ValueKind& kind, Reading& reading, int nesting) {
+  if (kind.isEmbedded) return readEmbedded(place, text, reading, nesting);
   switch (kind.type) {
     case schema::Type::String:
       return text;
@@ -198,25 +262,28 @@ broker::Scalar scalarOf(xml_node place, std::string text, const ValueKind& kind,
 }
 
 /// VALUE, VALUE.ARRAY, VALUE.REFERENCE or VALUE.REFARRAY.
-broker::Value readValue(xml_node node, const ValueKind& kind, const XmlLimits& limits, int nesting) {
+broker::Value readValue(xml_node node, const ValueKind& kind, Reading& reading, int nesting) {
   broker::Value value = broker::Value::null(kind.type);
   value.isNull = false;
   if (is(node, "VALUE")) {
-    value.scalar = scalarOf(node, contentOf(node), kind, limits, nesting);
+    value.scalar = scalarOf(node, contentOf(node), kind, reading, nesting);
     value.isNull = std::holds_alternative<std::monostate>(value.scalar);
     return value;
   }
-  if (is(node, "VALUE.REFERENCE")) return broker::Value::reference(readReference(node));
+  if (is(node, "VALUE.REFERENCE")) return broker::Value::reference(readReference(node, reading));
   value.isArray = true;
   if (is(node, "VALUE.REFARRAY")) value.type = schema::Type::Reference;
+  Count elements(reading.limits.values, "values");
   for (const xml_node child : node.children()) {
     if (!isElement(child)) continue;
+    reading.step();
+    elements.add(child, node);
     if (is(child, "VALUE.NULL")) {
       value.elements.emplace_back();
     } else if (is(child, "VALUE") && is(node, "VALUE.ARRAY")) {
-      value.elements.push_back(scalarOf(child, contentOf(child), kind, limits, nesting));
+      value.elements.push_back(scalarOf(child, contentOf(child), kind, reading, nesting));
     } else if (is(child, "VALUE.REFERENCE") && is(node, "VALUE.REFARRAY")) {
-      value.elements.emplace_back(broker::Boxed<broker::ObjectPath>(readReference(child)));
+      value.elements.emplace_back(broker::Boxed<broker::ObjectPath>(readReference(child, reading)));
     } else {
       refuse(child, std::string(child.name()) + " within " + node.name());
     }
@@ -224,17 +291,19 @@ broker::Value readValue(xml_node node, const ValueKind& kind, const XmlLimits& l
   return value;
 }
 
-std::string readNamespace(xml_node node) {
+std::string readNamespace(xml_node node, Reading& reading) {
   std::string path;
+  Count parts(reading.limits.namespaces, "namespaces");
   for (const xml_node part : node.children("NAMESPACE")) {
+    parts.add(part, node);
     if (!path.empty()) path += '/';
-    path += attribute(part, "NAME");
+    path += attribute(reading, part, "NAME");
   }
   if (path.empty()) refuse(node, "LOCALNAMESPACEPATH names no namespace");
   return path;
 }
 
-broker::Value readKeyValue(xml_node node) {
+broker::Value readKeyValue(xml_node node, Reading& reading) {
   const std::string_view told = node.attribute("VALUETYPE").value();
   ValueKind kind{typeOf(node, "TYPE"), false};
   std::string text = contentOf(node);
@@ -247,111 +316,122 @@ broker::Value readKeyValue(xml_node node) {
   }
   broker::Value value = broker::Value::null(kind.type);
   value.isNull = false;
-  value.scalar = scalarOf(node, std::move(text), kind, {}, 0);
+  value.scalar = scalarOf(node, std::move(text), kind, reading, 0);
   return value;
 }
 
-void readInstanceName(xml_node node, broker::ObjectPath& path) {
-  path.className = attribute(node, "CLASSNAME");
+broker::Value readKey(xml_node value, Reading& reading) {
+  if (is(value, "KEYVALUE")) return readKeyValue(value, reading);
+  return broker::Value::reference(readReference(value, reading));
+}
+
+void readInstanceName(xml_node node, Reading& reading, broker::ObjectPath& path) {
+  path.className = attribute(reading, node, "CLASSNAME");
+  Count count(reading.limits.keys, "keys");
+  UniqueNames names;
   for (const xml_node child : node.children()) {
     if (!isElement(child)) continue;
+    reading.step();
     if (is(child, "KEYBINDING")) {
-      const xml_node value = required(child, {"KEYVALUE", "VALUE.REFERENCE"});
-      std::string name(attribute(child, "NAME"));
-      if (path.key(name) != nullptr) refuse(child, "the key " + quoted(name) + " stands twice");
-      path.keys.push_back({std::move(name), is(value, "KEYVALUE") ? readKeyValue(value)
-                                                                  : broker::Value::reference(readReference(value))});
-    } else if (is(child, "KEYVALUE") && path.keys.empty()) {
-      path.keys.push_back({"", readKeyValue(child)});
-    } else if (is(child, "VALUE.REFERENCE") && path.keys.empty()) {
-      path.keys.push_back({"", broker::Value::reference(readReference(child))});
+      count.add(child, node);
+      const std::string_view name = attribute(reading, child, "NAME");
+      names.add(child, "key", name);
+      path.keys.push_back({std::string(name), readKey(required(child, {"KEYVALUE", "VALUE.REFERENCE"}), reading)});
+    } else if (isOneOf(child, {"KEYVALUE", "VALUE.REFERENCE"}) && path.keys.empty()) {
+      path.keys.push_back({"", readKey(child, reading)});
     }
   }
 }
 
-void readNamespacePath(xml_node node, broker::ObjectPath& path) {
+void readNamespacePath(xml_node node, Reading& reading, broker::ObjectPath& path) {
   path.host = trimmed(contentOf(required(node, {"HOST"})));
-  path.nameSpace = readNamespace(required(node, {"LOCALNAMESPACEPATH"}));
+  path.nameSpace = readNamespace(required(node, {"LOCALNAMESPACEPATH"}), reading);
 }
 
 /// INSTANCENAME, LOCALINSTANCEPATH, INSTANCEPATH, and the same of a class.
-broker::ObjectPath readPath(xml_node node) {
+broker::ObjectPath readPath(xml_node node, Reading& reading) {
   broker::ObjectPath path;
   if (is(node, "INSTANCENAME")) {
-    readInstanceName(node, path);
+    readInstanceName(node, reading, path);
     return path;
   }
   if (is(node, "CLASSNAME")) {
-    path.className = attribute(node, "NAME");
+    path.className = attribute(reading, node, "NAME");
     return path;
   }
   if (isOneOf(node, {"LOCALINSTANCEPATH", "LOCALCLASSPATH"})) {
-    path.nameSpace = readNamespace(required(node, {"LOCALNAMESPACEPATH"}));
+    path.nameSpace = readNamespace(required(node, {"LOCALNAMESPACEPATH"}), reading);
   } else {
-    readNamespacePath(required(node, {"NAMESPACEPATH"}), path);
+    readNamespacePath(required(node, {"NAMESPACEPATH"}), reading, path);
   }
   if (isOneOf(node, {"LOCALCLASSPATH", "CLASSPATH"})) {
-    path.className = attribute(required(node, {"CLASSNAME"}), "NAME");
+    path.className = attribute(reading, required(node, {"CLASSNAME"}), "NAME");
   } else {
-    readInstanceName(required(node, {"INSTANCENAME"}), path);
+    readInstanceName(required(node, {"INSTANCENAME"}), reading, path);
   }
   return path;
 }
 
-broker::ObjectPath readReference(xml_node node) {
-  return readPath(required(
-      node, {"INSTANCENAME", "LOCALINSTANCEPATH", "INSTANCEPATH", "CLASSNAME", "LOCALCLASSPATH", "CLASSPATH"}));
+broker::ObjectPath readReference(xml_node node, Reading& reading) {
+  return readPath(
+      required(node, {"INSTANCENAME", "LOCALINSTANCEPATH", "INSTANCEPATH", "CLASSNAME", "LOCALCLASSPATH", "CLASSPATH"}),
+      reading);
 }
 
-broker::Property readProperty(xml_node node, const XmlLimits& limits, int nesting) {
+broker::Property readProperty(xml_node node, Reading& reading, int nesting) {
   const bool isReference = is(node, "PROPERTY.REFERENCE");
   const bool isArray = is(node, "PROPERTY.ARRAY");
   const ValueKind kind = isReference ? ValueKind{schema::Type::Reference, false} : kindOf(node, "TYPE");
   const char* const wanted = isReference ? "VALUE.REFERENCE" : isArray ? "VALUE.ARRAY" : "VALUE";
   broker::Property property;
-  property.name = attribute(node, "NAME");
+  property.name = attribute(reading, node, "NAME");
   const xml_node value = firstOf(node, {wanted});
-  property.value = value ? readValue(value, kind, limits, nesting) : broker::Value::null(kind.type, isArray);
+  property.value = value ? readValue(value, kind, reading, nesting) : broker::Value::null(kind.type, isArray);
   return property;
 }
 
-broker::Instance readInstance(xml_node node, const XmlLimits& limits, int nesting) {
+broker::Instance readInstance(xml_node node, Reading& reading, int nesting) {
   broker::Instance instance;
-  instance.path.className = attribute(node, "CLASSNAME");
+  instance.path.className = attribute(reading, node, "CLASSNAME");
+  Count count(reading.limits.properties, "properties");
+  UniqueNames names;
   for (const xml_node child : node.children()) {
     if (!isElement(child) || !isOneOf(child, {"PROPERTY", "PROPERTY.ARRAY", "PROPERTY.REFERENCE"})) continue;
-    broker::Property property = readProperty(child, limits, nesting);
-    if (instance.property(property.name) != nullptr) {
-      refuse(child, "the property " + quoted(property.name) + " stands twice");
-    }
-    instance.properties.push_back(std::move(property));
+    reading.step();
+    count.add(child, node);
+    names.add(child, "property", attribute(reading, child, "NAME"));
+    instance.properties.push_back(readProperty(child, reading, nesting));
   }
   return instance;
 }
 
-TextList readTexts(xml_node node) {
+TextList readTexts(xml_node node, Reading& reading) {
   TextList texts;
+  Count count(reading.limits.values, "values");
   for (const xml_node child : node.children()) {
+    if (!isElement(child)) continue;
+    reading.step();
+    count.add(child, node);
     if (is(child, "VALUE")) texts.emplace_back(contentOf(child));
     if (is(child, "VALUE.NULL")) texts.emplace_back();
   }
   return texts;
 }
 
-ParameterValue readParameterValue(xml_node node, const XmlLimits& limits) {
+ParameterValue readParameterValue(xml_node node, Reading& reading) {
   const xml_node value = firstOf(node, {"VALUE", "VALUE.ARRAY", "VALUE.REFERENCE", "CLASSNAME", "INSTANCENAME",
                                         "INSTANCE", "VALUE.NAMEDINSTANCE", "CLASS", "QUALIFIER.DECLARATION"});
   if (!value) return {};
   if (is(value, "VALUE")) return contentOf(value);
-  if (is(value, "VALUE.ARRAY")) return readTexts(value);
-  if (is(value, "CLASSNAME")) return ClassName{std::string(attribute(value, "NAME"))};
-  if (is(value, "INSTANCENAME")) return readPath(value);
-  if (is(value, "VALUE.REFERENCE")) return readReference(value);
-  if (is(value, "INSTANCE")) return readInstance(value, limits, 0);
+  if (is(value, "VALUE.ARRAY")) return readTexts(value, reading);
+  if (is(value, "CLASSNAME")) return ClassName{std::string(attribute(reading, value, "NAME"))};
+  if (is(value, "INSTANCENAME")) return readPath(value, reading);
+  if (is(value, "VALUE.REFERENCE")) return readReference(value, reading);
+  if (is(value, "INSTANCE")) return readInstance(value, reading, 0);
   if (!is(value, "VALUE.NAMEDINSTANCE")) return Declaration{};
-  broker::Instance instance = readInstance(required(value, {"INSTANCE"}), limits, 0);
+  broker::Instance instance = readInstance(required(value, {"INSTANCE"}), reading, 0);
   const std::string madeOf = instance.path.className;
-  readInstanceName(required(value, {"INSTANCENAME"}), instance.path);
+  readInstanceName(required(value, {"INSTANCENAME"}), reading, instance.path);
   if (!schema::sameName(madeOf, instance.path.className)) {
     refuse(value, "INSTANCENAME and INSTANCE are of the classes " + quoted(instance.path.className) + " and " +
                       quoted(madeOf));
@@ -359,73 +439,73 @@ ParameterValue readParameterValue(xml_node node, const XmlLimits& limits) {
   return instance;
 }
 
-void readIntrinsic(xml_node node, const XmlLimits& limits, Call& call) {
-  call.name = attribute(node, "NAME");
-  call.target.nameSpace = readNamespace(required(node, {"LOCALNAMESPACEPATH"}));
+void readIntrinsic(xml_node node, Reading& reading, Call& call) {
+  call.name = attribute(reading, node, "NAME");
+  call.target.nameSpace = readNamespace(required(node, {"LOCALNAMESPACEPATH"}), reading);
+  Count count(reading.limits.parameters, "parameters");
+  UniqueNames names;
   for (const xml_node child : node.children("IPARAMVALUE")) {
-    Parameter parameter{std::string(attribute(child, "NAME")), readParameterValue(child, limits)};
-    const auto same = [&](const Parameter& other) { return schema::sameName(other.name, parameter.name); };
-    if (std::any_of(call.parameters.begin(), call.parameters.end(), same)) {
-      refuse(child, "the parameter " + quoted(parameter.name) + " stands twice");
-    }
-    call.parameters.push_back(std::move(parameter));
+    count.add(child, node);
+    const std::string_view name = attribute(reading, child, "NAME");
+    names.add(child, "parameter", name);
+    call.parameters.push_back({std::string(name), readParameterValue(child, reading)});
   }
 }
 
-broker::Value readArgument(xml_node node, const XmlLimits& limits) {
+broker::Value readArgument(xml_node node, Reading& reading) {
   const ValueKind kind = kindOf(node, "PARAMTYPE");
   const xml_node value = firstOf(node, {"VALUE", "VALUE.ARRAY", "VALUE.REFERENCE", "VALUE.REFARRAY", "CLASSNAME",
                                         "INSTANCENAME", "CLASS", "INSTANCE", "VALUE.NAMEDINSTANCE"});
   if (!value) return broker::Value::null(kind.type);
-  if (is(value, "INSTANCENAME")) return broker::Value::reference(readPath(value));
+  if (is(value, "INSTANCENAME")) return broker::Value::reference(readPath(value, reading));
   if (is(value, "INSTANCE")) {
     broker::Value instance = broker::Value::null(schema::Type::String);
     instance.isNull = false;
-    instance.scalar = broker::Boxed<broker::Instance>(readInstance(value, limits, 0));
+    instance.scalar = broker::Boxed<broker::Instance>(readInstance(value, reading, 0));
     return instance;
   }
   if (isOneOf(value, {"CLASSNAME", "CLASS", "VALUE.NAMEDINSTANCE"})) {
     refuse(value, std::string(value.name()) + " is no value that a method takes");
   }
-  return readValue(value, kind, limits, 0);
+  return readValue(value, kind, reading, 0);
 }
 
-void readExtrinsic(xml_node node, const XmlLimits& limits, Call& call) {
+void readExtrinsic(xml_node node, Reading& reading, Call& call) {
   call.isExtrinsic = true;
-  call.name = attribute(node, "NAME");
+  call.name = attribute(reading, node, "NAME");
   const xml_node target = required(node, {"LOCALINSTANCEPATH", "LOCALCLASSPATH"});
-  call.target = readPath(target);
+  call.target = readPath(target, reading);
   call.onClass = is(target, "LOCALCLASSPATH");
+  Count count(reading.limits.parameters, "parameters");
+  UniqueNames names;
   for (const xml_node child : node.children("PARAMVALUE")) {
-    broker::NamedValue argument{std::string(attribute(child, "NAME")), readArgument(child, limits)};
-    const auto same = [&](const broker::NamedValue& other) { return schema::sameName(other.name, argument.name); };
-    if (std::any_of(call.input.begin(), call.input.end(), same)) {
-      refuse(child, "the parameter " + quoted(argument.name) + " stands twice");
-    }
-    call.input.push_back(std::move(argument));
+    count.add(child, node);
+    const std::string_view name = attribute(reading, child, "NAME");
+    names.add(child, "parameter", name);
+    call.input.push_back({std::string(name), readArgument(child, reading)});
   }
 }
 
-Call readCall(xml_node simple, const XmlLimits& limits) {
+Call readCall(xml_node simple, Reading& reading) {
   Call call;
   const xml_node node = required(simple, {"IMETHODCALL", "METHODCALL"});
   if (is(node, "IMETHODCALL")) {
-    readIntrinsic(node, limits, call);
+    readIntrinsic(node, reading, call);
   } else {
-    readExtrinsic(node, limits, call);
+    readExtrinsic(node, reading, call);
   }
   return call;
 }
 
-void checkVersion(xml_node node, const char* name, std::string_view major, Fault fault) {
-  const std::string_view version = attribute(node, name);
+void checkVersion(xml_node node, Reading& reading, const char* name, std::string_view major, Fault fault) {
+  const std::string_view version = attribute(reading, node, name);
   if (version.starts_with(major) && version.size() > major.size()) return;
   refuse(node, std::string(name) + " is " + quoted(version) + ", where " + std::string(major) + "x is taken", fault);
 }
 
-void readMessage(xml_node message, const ReaderLimits& limits, CimRequest& request) {
-  request.id = attribute(message, "ID");
-  checkVersion(message, "PROTOCOLVERSION", "1.", Fault::UnsupportedProtocolVersion);
+void readMessage(xml_node message, Reading& reading, CimRequest& request) {
+  request.id = attribute(reading, message, "ID");
+  checkVersion(message, reading, "PROTOCOLVERSION", "1.", Fault::UnsupportedProtocolVersion);
   if (firstOf(message, {"SIMPLEEXPREQ", "MULTIEXPREQ"})) {
     refuse(message, "indications are not taken here", Fault::UnsupportedOperation);
   }
@@ -433,14 +513,13 @@ void readMessage(xml_node message, const ReaderLimits& limits, CimRequest& reque
   request.isMultiple = is(body, "MULTIREQ");
   request.calls.clear();
   if (!request.isMultiple) {
-    request.calls.push_back(readCall(body, limits.xml));
+    request.calls.push_back(readCall(body, reading));
     return;
   }
+  Count count(reading.limits.calls, "requests");
   for (const xml_node simple : body.children("SIMPLEREQ")) {
-    if (request.calls.size() == limits.calls) {
-      refuse(simple, "more than " + std::to_string(limits.calls) + " requests in one MULTIREQ");
-    }
-    request.calls.push_back(readCall(simple, limits.xml));
+    count.add(simple, body);
+    request.calls.push_back(readCall(simple, reading));
   }
   if (request.calls.size() < 2) refuse(body, "MULTIREQ has fewer than two SIMPLEREQs");
 }
@@ -450,15 +529,14 @@ void readMessage(xml_node message, const ReaderLimits& limits, CimRequest& reque
 std::optional<RequestError> readRequest(std::string_view text, const ReaderLimits& limits, CimRequest& request) {
   std::string buffer;
   pugi::xml_document document;
+  Reading reading(limits);
   try {
-    parse(text, limits.xml, buffer, document);
-    AttributeWalk walk;
-    document.traverse(walk);
+    parse(text, reading, buffer, document);
     const xml_node root = document.document_element();
     if (!is(root, "CIM")) refuse(root, "the root element is " + elementName(root) + ", where CIM is taken");
-    checkVersion(root, "CIMVERSION", "2.", Fault::UnsupportedCimVersion);
-    checkVersion(root, "DTDVERSION", "2.", Fault::UnsupportedDtdVersion);
-    readMessage(required(root, {"MESSAGE"}), limits, request);
+    checkVersion(root, reading, "CIMVERSION", "2.", Fault::UnsupportedCimVersion);
+    checkVersion(root, reading, "DTDVERSION", "2.", Fault::UnsupportedDtdVersion);
+    readMessage(required(root, {"MESSAGE"}), reading, request);
   } catch (Refusal& refusal) {
     if (refusal.position < 0) return RequestError{refusal.fault, std::move(refusal.message)};
     const auto position = static_cast<std::size_t>(refusal.position);

@@ -10,6 +10,9 @@ namespace zorva::cimxml {
 
 namespace {
 
+// After so many bytes the checker asks whether its time is over.
+constexpr std::size_t kBytesBetweenLooks = std::size_t{64} << 10;
+
 constexpr bool isSpace(char c) noexcept { return c == ' ' || c == '\t' || c == '\n' || c == '\r'; }
 
 constexpr bool isXmlCharacter(std::uint32_t code) noexcept {
@@ -24,7 +27,8 @@ class Checker {
   std::optional<XmlProblem> run() {
     if (!characters()) return std::move(problem_);
     if (text_.starts_with("\xEF\xBB\xBF")) at_ = 3;
-    while (at_ < text_.size() && content()) {
+    nextLook_ = kBytesBetweenLooks;
+    while (at_ < text_.size() && goesOn(at_) && content()) {
     }
     if (problem_.message.empty() && depth_ > 0) fail(text_.size(), "the text ends within an element");
     if (problem_.message.empty() && elements_ == 0) fail(text_.size(), "the text has no element");
@@ -38,9 +42,19 @@ class Checker {
     return false;
   }
 
+  /// False once the time is over.
+  bool goesOn(std::size_t position) {
+    if (position < nextLook_) return true;
+    nextLook_ = position + kBytesBetweenLooks;
+    if (!limits_.isOver || !limits_.isOver()) return true;
+    problem_ = {position, kTimeIsOver, false, true};
+    return false;
+  }
+
   /// Whether all is UTF-8, and of XML's characters.
   bool characters() {
     for (std::size_t i = 0; i < text_.size();) {
+      if (!goesOn(i)) return false;
       const auto byte = static_cast<unsigned char>(text_[i]);
       if (byte >= 0x20 && byte < 0x80) {
         ++i;
@@ -181,6 +195,7 @@ class Checker {
   const std::string_view text_;
   const XmlLimits& limits_;
   std::size_t at_ = 0;
+  std::size_t nextLook_ = kBytesBetweenLooks;
   std::size_t depth_ = 0;
   std::size_t elements_ = 0;
   XmlProblem problem_;

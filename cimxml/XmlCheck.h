@@ -2,6 +2,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -15,13 +16,19 @@ namespace zorva::cimxml {
 struct XmlLimits {
   std::size_t depth = 128;         ///< elements within one another
   std::size_t elements = 200'000;  ///< in all
+  /// Asked now and then while a text is read; true ends the reading. May be empty.
+  std::function<bool()> isOver = {};
 };
+
+/// What the reading says that isOver has ended.
+inline constexpr const char* kTimeIsOver = "the time for this request was over before it was read";
 
 /// Where a text goes wrong, and how.
 struct XmlProblem {
   std::size_t position = 0;  ///< in bytes from 0
   std::string message;
   bool isLimit = false;  ///< nothing is wrong but the size
+  bool isOver = false;   ///< the reading was ended
 };
 
 /// Nothing where the text passes. Takes time in proportion to the text, and no memory.

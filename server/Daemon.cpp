@@ -136,10 +136,7 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
   service_ = std::make_unique<Service>(*broker_, serviceOptions(config_));
   server_ = std::make_unique<HttpServer>(
       config_.limits, config_.threads,
-      [service = service_.get()](const HttpRequest& request, ResponseSink& sink) { service->handle(request, sink); },
-      [service = service_.get()](const HttpRequest& request, const std::string& why, ResponseSink& sink) {
-        service->handleLate(request, why, sink);
-      });
+      [service = service_.get()](const HttpRequest& request, ResponseSink& sink) { service->handle(request, sink); });
 }
 
 void Daemon::greet() const {

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
 #include <stdexcept>
 #include <string>
 #include <string_view>
@@ -30,6 +31,11 @@ class ClientGone : public std::runtime_error {
   using std::runtime_error::runtime_error;
 };
 
+class ResponseSink;
+
+/// Writes the answer to a request that is given up, for the reason `why`. It holds what it needs of the request.
+using LateAnswer = std::function<void(const std::string& why, ResponseSink& sink)>;
+
 /// Takes the response to one request. Used by one thread at a time.
 class ResponseSink {
  public:
@@ -45,6 +51,13 @@ class ResponseSink {
   /// After begin: the operation failed, with a CIM status code, although its response has begun. It is told in trailers
   /// to a client that takes them; else the connection is closed before the body is complete. Nothing is written after.
   virtual void fail(std::uint32_t cimStatus, std::string_view description) = 0;
+
+  /// Before begin: what answers should the work be given up. It runs on the thread that gives up, so it must be quick:
+  /// in no case does it read the body again. Without one the answer is an HTTP status.
+  virtual void setLateAnswer(LateAnswer) {}
+
+  /// False: nobody waits for the response any more, and the work may end. For work that would not notice otherwise.
+  virtual bool isWanted() const { return true; }
 
   /// True once begin was called.
   virtual bool begun() const = 0;

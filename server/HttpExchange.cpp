@@ -80,6 +80,16 @@ bool HttpExchange::begun() const {
   return begun_;
 }
 
+void HttpExchange::setLateAnswer(LateAnswer answer) {
+  const std::lock_guard lock(mutex_);
+  lateAnswer_ = std::move(answer);
+}
+
+bool HttpExchange::isWanted() const {
+  const std::lock_guard lock(mutex_);
+  return !gone_ && !givenUp_;
+}
+
 void HttpExchange::finish(const Refusal& orElse) {
   const std::lock_guard lock(mutex_);
   if (gone_ || complete_) return;
@@ -180,9 +190,7 @@ class TextSink : public ResponseSink {
 
 }  // namespace
 
-bool HttpExchange::giveUp(const std::function<void(ResponseSink&)>& answer) {
-  TextSink other;
-  answer(other);
+bool HttpExchange::giveUp(const Refusal& orElse) {
   const std::lock_guard lock(mutex_);
   if (gone_ || complete_ || givenUp_) return false;
   givenUp_ = true;
@@ -192,14 +200,21 @@ bool HttpExchange::giveUp(const std::function<void(ResponseSink&)>& answer) {
     cimStatus_ = kFailed;
     description_ = "the request was given up";
   } else {
-    begun_ = true;
-    status_ = other.status_;
-    headers_ = std::move(other.headers_);
-    held_ = std::move(other.text_);
+    takeLateAnswer(orElse);
   }
   complete();
   room_.notify_all();
   return true;
+}
+
+void HttpExchange::takeLateAnswer(const Refusal& orElse) {
+  TextSink answer;
+  if (lateAnswer_) lateAnswer_(orElse.why, answer);
+  const bool hasAnswer = answer.begun();
+  begun_ = true;
+  status_ = hasAnswer ? answer.status_ : orElse.status;
+  headers_ = hasAnswer ? std::move(answer.headers_) : headersOf(orElse);
+  held_ = hasAnswer ? std::move(answer.text_) : textOf(orElse);
 }
 
 // ---- The event thread ----

@@ -78,6 +78,8 @@ class HttpExchange final : public ResponseSink {
   void write(std::string_view text) override;
   void fail(std::uint32_t cimStatus, std::string_view description) override;
   bool begun() const override;
+  void setLateAnswer(LateAnswer answer) override;
+  bool isWanted() const override;
 
   /// The work is done. Where it wrote nothing, `orElse` is the answer.
   void finish(const Refusal& orElse);
@@ -90,13 +92,14 @@ class HttpExchange final : public ResponseSink {
   /// For how long it has been waiting for the client now.
   Clock::duration waiting() const;
 
-  /// Gives the work up, in whose place `answer` writes the response, if nothing of one was sent yet. Later results are
-  /// dropped. False: the work was done.
-  bool giveUp(const std::function<void(ResponseSink&)>& answer);
+  /// Gives the work up. Where nothing of a response was sent yet, the late answer that was set is the response, else
+  /// `orElse`. Later results are dropped. False: the work was done.
+  bool giveUp(const Refusal& orElse);
 
   std::size_t place = 0;  ///< in the list of who owns it, under that one's lock
 
  private:
+  void takeLateAnswer(const Refusal& orElse);
   void append(std::string_view text);
   void startStreaming();
   void waitForClient(std::unique_lock<std::mutex>& lock);
@@ -134,6 +137,7 @@ class HttpExchange final : public ResponseSink {
   bool failed_ = false;
   std::uint32_t cimStatus_ = 0;
   std::string description_;
+  LateAnswer lateAnswer_;
   std::optional<Clock::time_point> started_;  ///< moved on by the time spent waiting
   std::optional<Clock::time_point> waitingSince_;
 };

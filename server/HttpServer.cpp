@@ -43,7 +43,7 @@ std::string withoutLineEnd(std::string text) {
 
 class HttpServer::Core {
  public:
-  Core(const HttpLimits& limits, int threads, Handler handler, LateHandler lateHandler);
+  Core(const HttpLimits& limits, int threads, Handler handler);
   ~Core();
 
   void take(int socket, const sockaddr_storage& peer, socklen_t peerSize);
@@ -83,17 +83,9 @@ class HttpServer::Core {
   MHD_Daemon* daemon_ = nullptr;
 };
 
-HttpServer::Core::Core(const HttpLimits& limits, int threads, Handler handler, LateHandler lateHandler)
+HttpServer::Core::Core(const HttpLimits& limits, int threads, Handler handler)
     : limits_(limits),
-      workers_(
-          limits, [work = std::move(handler)](HttpExchange& exchange) { work(exchange.request, exchange); },
-          [late = std::move(lateHandler)](const HttpRequest& request, const std::string& why, ResponseSink& sink) {
-            if (late) late(request, why, sink);
-            if (sink.begun()) return;
-            const Refusal refusal{500, why, {}};
-            sink.begin(refusal.status, headersOf(refusal));
-            sink.write(textOf(refusal));
-          }) {
+      workers_(limits, [work = std::move(handler)](HttpExchange& exchange) { work(exchange.request, exchange); }) {
   startDaemon(threads);
 }
 
@@ -316,8 +308,8 @@ void HttpServer::Core::onLog(void*, const char* format, va_list arguments) {
 
 // ---- HttpServer ----
 
-HttpServer::HttpServer(const HttpLimits& limits, int threads, Handler handler, LateHandler lateHandler)
-    : core_(std::make_unique<Core>(limits, threads, std::move(handler), std::move(lateHandler))) {}
+HttpServer::HttpServer(const HttpLimits& limits, int threads, Handler handler)
+    : core_(std::make_unique<Core>(limits, threads, std::move(handler))) {}
 
 HttpServer::~HttpServer() = default;
 

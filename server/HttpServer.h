@@ -21,13 +21,11 @@ class HttpServer {
  public:
   /// Answers a request; called on worker threads, on many at once.
   using Handler = std::function<void(const HttpRequest&, ResponseSink&)>;
-  /// Writes the answer to a request whose handler did not return in time. Called on the thread that sweeps, while the
-  /// handler may still be running.
-  using LateHandler = std::function<void(const HttpRequest&, const std::string& why, ResponseSink&)>;
 
-  /// `lateHandler` may be empty: the answer is then a status of 500 with a sentence. Throws std::runtime_error where
-  /// the threads cannot be started.
-  HttpServer(const HttpLimits& limits, int threads, Handler handler, LateHandler lateHandler = {});
+  /// A request whose handler does not return in time gets the late answer that the handler has set, on the thread that
+  /// sweeps; without one, a status of 500 with a sentence. Throws std::runtime_error where the threads cannot be
+  /// started.
+  HttpServer(const HttpLimits& limits, int threads, Handler handler);
 
   /// Ends all connections, and waits for handlers that have not returned.
   ~HttpServer();

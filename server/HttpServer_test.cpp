@@ -12,9 +12,7 @@
 #include <mutex>
 #include <thread>
 
-#include "server/Daemon.h"
 #include "server/Listener.h"
-#include "server/Service.h"
 #include "server/TestWire.h"
 
 namespace zorva::server {
@@ -58,9 +56,9 @@ class Gate {
 /// An HTTP server on a free port, with a thread that accepts and sweeps.
 class Server {
  public:
-  explicit Server(HttpServer::Handler handler, const HttpLimits& limits = {}, HttpServer::LateHandler late = {})
+  explicit Server(HttpServer::Handler handler, const HttpLimits& limits = {})
       : listeners_(listenOn(Addresses{"127.0.0.1"}, 0)),
-        server_(limits, 2, std::move(handler), std::move(late)),
+        server_(limits, 2, std::move(handler)),
         thread_([this] { run(); }) {}
   ~Server() {
     ending_ = true;
@@ -276,25 +274,43 @@ TEST(HttpServer, AHandlerThatDoesNotReturnIsGivenUpAndTheOthersGoOn) {
   gate.open();
 }
 
-TEST(HttpServer, AProviderThatDoesNotReturnIsAnErrorOfItsOperation) {
-  Config config;
-  config.providerDirectory = ZORVA_LIB_DIR;
-  const auto broker = makeBuiltInBroker(config);
-  Service service(*broker);
+TEST(HttpServer, AHandlerThatDoesNotReturnIsAnsweredAsItHasSaid) {
   HttpLimits limits;
   limits.provider = milliseconds(200);
   Gate gate;
-  Server server([&](const HttpRequest&, ResponseSink&) { gate.wait(); }, limits,
-                [&](const HttpRequest& request, const std::string& why, ResponseSink& sink) {
-                  service.handleLate(request, why, sink);
-                });
+  Server server(
+      [&](const HttpRequest&, ResponseSink& sink) {
+        sink.setLateAnswer([](const std::string& why, ResponseSink& late) { answer(late, "late, since " + why); });
+        gate.wait();
+      },
+      limits);
   Wire wire(server.port());
-  ASSERT_TRUE(wire.send(testing::enumeration("EnumerateInstanceNames", "ZORVA_DNSProtocolEndPoint")));
+  ASSERT_TRUE(wire.send(testing::posting("x")));
   const WireResponse response = wire.receive();
   EXPECT_EQ(response.status, 200);
-  EXPECT_THAT(response.body, HasSubstr("<IMETHODRESPONSE NAME=\"EnumerateInstanceNames\"><ERROR CODE=\"1\""));
-  EXPECT_THAT(response.body, HasSubstr("did not return within 200 ms"));
+  EXPECT_EQ(response.body, "late, since the provider did not return within 200 ms");
   gate.open();
+}
+
+TEST(HttpServer, AHandlerCanSeeThatItWasGivenUp) {
+  HttpLimits limits;
+  limits.provider = milliseconds(200);
+  limits.workers = 1;
+  std::atomic<bool> hasSeen = false;
+  Server server(
+      [&](const HttpRequest& request, ResponseSink& sink) {
+        while (request.body == "long" && sink.isWanted()) std::this_thread::sleep_for(milliseconds(1));
+        if (!sink.isWanted()) hasSeen = true;
+        echo(request, sink);
+      },
+      limits);
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send(testing::posting("long")));
+  EXPECT_EQ(wire.receive().status, 500);
+  ASSERT_TRUE(wire.send(testing::posting("short")));
+  EXPECT_EQ(wire.receive().body, "short");
+  for (int i = 0; i < 2000 && !hasSeen; ++i) std::this_thread::sleep_for(milliseconds(5));
+  EXPECT_TRUE(hasSeen);
 }
 
 TEST(HttpServer, AHandlerThatHangsAfterTheBeginningIsToldInTrailers) {

@@ -34,6 +34,8 @@ HttpRefusal refusalOf(const cimxml::RequestError& error) {
       return {501, "unsupported-dtd-version", error.message};
     case cimxml::Fault::UnsupportedProtocolVersion:
       return {501, "unsupported-protocol-version", error.message};
+    case cimxml::Fault::TimeIsOver:
+      return {503, "", error.message};
     case cimxml::Fault::UnsupportedOperation:
       break;
   }
@@ -48,6 +50,46 @@ PullLimits pullLimits(const ServiceOptions& options) {
   limits.maxObjects = options.maxPullObjects;
   limits.maxBytes = options.maxPullBytes;
   return limits;
+}
+
+/// What an answer repeats of its request.
+struct Outline {
+  struct CallName {
+    std::string name;
+    bool isExtrinsic;
+  };
+  std::string id;
+  bool isMultiple = false;
+  std::vector<CallName> calls;
+  CimHeaders headers;
+};
+
+/// Says of each operation that it has failed.
+void writeFailures(const Outline& outline, const std::string& why, ResponseSink& sink) {
+  sink.begin(200, responseHeaders(outline.headers));
+  std::string text;
+  cimxml::ResponseWriter writer(text, std::string::npos, [&](std::string_view piece) { sink.write(piece); });
+  writer.beginMessage(outline.id, outline.isMultiple);
+  for (const Outline::CallName& call : outline.calls) {
+    writer.beginResponse(call.name, call.isExtrinsic);
+    writer.putError(CMPI_RC_ERR_FAILED, why);
+    writer.endResponse();
+  }
+  writer.endMessage();
+}
+
+/// The request itself ends with the work on it, which may be while the late answer is written.
+LateAnswer lateAnswer(const cimxml::CimRequest& request, const CimHeaders& headers) {
+  auto outline = std::make_shared<Outline>();
+  outline->id = request.id;
+  outline->isMultiple = request.isMultiple;
+  outline->calls.reserve(request.calls.size());
+  for (const cimxml::Call& call : request.calls) outline->calls.push_back({call.name, call.isExtrinsic});
+  outline->headers.prefix = headers.prefix;
+  outline->headers.isExtended = headers.isExtended;
+  return [outline = std::move(outline)](const std::string& why, ResponseSink& sink) {
+    writeFailures(*outline, why, sink);
+  };
 }
 
 /// The memory that this thread's responses gather in, used again and again.
@@ -76,14 +118,14 @@ class ServiceCore {
   ServiceCore(broker::Broker& broker, ServiceOptions options)
       : broker_(broker), options_(std::move(options)), host_(options_.hostName), pulls_(pullLimits(options_)) {}
 
-  /// `instead`, where there is one, stands for what each operation comes to.
-  void handle(const HttpRequest& http, ResponseSink& sink, broker::Caller caller, const Status* instead = nullptr) {
+  void handle(const HttpRequest& http, ResponseSink& sink, broker::Caller caller) {
     CimHeaders headers;
     cimxml::CimRequest request;
     std::optional<HttpRefusal> refusal = readHeaders(http, headers);
     if (!refusal) {
       cimxml::ReaderLimits limits;
       limits.xml.depth = options_.maxDepth;
+      limits.xml.isOver = [&sink] { return !sink.isWanted(); };
       limits.calls = options_.maxOperations;
       if (const auto error = cimxml::readRequest(http.body, limits, request)) refusal = refusalOf(*error);
     }
@@ -91,7 +133,8 @@ class ServiceCore {
     if (refusal) return refuse(*refusal, sink);
     caller.acceptLanguage = headers.acceptLanguage;
     caller.contentLanguage = headers.contentLanguage;
-    answer(request, headers, caller, sink, instead);
+    sink.setLateAnswer(lateAnswer(request, headers));
+    answer(request, headers, caller, sink);
   }
 
   void reclaim() { pulls_.reclaim(); }
@@ -119,7 +162,7 @@ class ServiceCore {
   }
 
   void answer(const cimxml::CimRequest& request, const CimHeaders& headers, const broker::Caller& caller,
-              ResponseSink& sink, const Status* instead) {
+              ResponseSink& sink) {
     Buffer buffer;
     cimxml::ResponseWriter writer(buffer.text(), options_.unsentText, [&](std::string_view text) {
       if (!sink.begun()) sink.begin(200, responseHeaders(headers));
@@ -129,7 +172,7 @@ class ServiceCore {
     for (const cimxml::Call& call : request.calls) {
       writer.beginResponse(call.name, call.isExtrinsic);
       Operation operation{broker_, pulls_, host_, caller, call, writer, headers.host, {}};
-      const Status status = instead != nullptr ? *instead : carryOutSafely(operation);
+      const Status status = carryOutSafely(operation);
       if (!status.ok()) {
         const std::string text(broker::statusName(status.rc));
         log(LogLevel::Info, call.name + " in " + broker::quotedText(call.target.nameSpace.substr(0, 200)) + ": " +
@@ -174,11 +217,6 @@ void Service::handle(const HttpRequest& request, ResponseSink& sink, const broke
     sink.begin(500, {{"Content-Type", "text/plain; charset=\"utf-8\""}});
     sink.write("the server cannot answer\n");
   }
-}
-
-void Service::handleLate(const HttpRequest& request, const std::string& why, ResponseSink& sink) {
-  const Status failed{CMPI_RC_ERR_FAILED, why};
-  core_->handle(request, sink, {}, &failed);
 }
 
 void Service::reclaim() { core_->reclaim(); }

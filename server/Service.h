@@ -48,11 +48,9 @@ class Service {
   /// sink, the only exception that comes out. Any number of threads may call it at once; a provider that does not
   /// return holds only the thread that called.
   /// `caller` is who asks, as far as that is known.
+  /// Once the request is read, the sink gets a late answer: each operation has failed, for the reason given. A request
+  /// that nobody waits for any more is not read to its end.
   void handle(const HttpRequest& request, ResponseSink& sink, const broker::Caller& caller = {});
-
-  /// The answer to a request whose handle() has not returned in time, and may still be running: each of its operations
-  /// has failed, for that reason. Asks no provider.
-  void handleLate(const HttpRequest& request, const std::string& why, ResponseSink& sink);
 
   /// Ends pulled enumerations whose client has not come back in time; cheap. They are looked at with each request too.
   void reclaim();

@@ -235,5 +235,51 @@ TEST(Service, LogsEachOperationThatFails) {
                                         "root/cimv2"));
 }
 
+/// A sink whose work can be given up.
+class ImpatientSink : public CollectingSink {
+ public:
+  void setLateAnswer(LateAnswer answer) override { late = std::move(answer); }
+  bool isWanted() const override { return looks++ < patience; }
+
+  LateAnswer late;
+  int patience = 1'000'000;
+  mutable int looks = 0;
+};
+
+TEST(Service, LeavesALateAnswerInWhichEachOperationHasFailed) {
+  TestService service;
+  ImpatientSink sink;
+  {
+    // The late answer may be asked for when the request is gone.
+    const auto request = std::make_unique<HttpRequest>(
+        post(message("<MULTIREQ>" + intrinsic("EnumerateInstanceNames", kThings) +
+                     testing::extrinsic("M", testing::instanceName("T_Thing", {{"Name", "a"}}), "") + "</MULTIREQ>"),
+             {{"CIMOperation", "MethodCall"}}));
+    service.service().handle(*request, sink);
+  }
+  ASSERT_TRUE(sink.late);
+  CollectingSink late;
+  sink.late("it took too long", late);
+  EXPECT_EQ(late.status, 200);
+  EXPECT_EQ(late.header("CIMOperation"), "MethodResponse");
+  EXPECT_THAT(late.body, HasSubstr("<MESSAGE ID=\"42\""));
+  EXPECT_THAT(late.body, HasSubstr("<IMETHODRESPONSE NAME=\"EnumerateInstanceNames\"><ERROR CODE=\"1\" "
+                                   "DESCRIPTION=\"it took too long\"/>"));
+  EXPECT_THAT(late.body, HasSubstr("<METHODRESPONSE NAME=\"M\"><ERROR CODE=\"1\""));
+  EXPECT_EQ(testing::dtdProblem(late.body), "");
+}
+
+TEST(Service, DoesNotReadOnWhereNobodyWaitsAnyMore) {
+  TestService service;
+  std::string extra;
+  for (int i = 0; i < 50'000; ++i) extra += "<EXTRA/>";
+  ImpatientSink sink;
+  sink.patience = 3;
+  service.service().handle(testing::request("EnumerateInstanceNames", kThings + extra), sink);
+  EXPECT_EQ(sink.looks, 4);
+  EXPECT_EQ(sink.status, 503);
+  EXPECT_FALSE(sink.late) << "what was not read has no late answer but that of HTTP";
+}
+
 }  // namespace
 }  // namespace zorva::server

@@ -41,8 +41,7 @@ using Sleeper = std::binary_semaphore;
 
 class Workers::Core : public WaitListener, public std::enable_shared_from_this<Core> {
  public:
-  Core(const HttpLimits& limits, Work work, LateAnswer lateAnswer)
-      : limits_(limits), work_(std::move(work)), lateAnswer_(std::move(lateAnswer)) {}
+  Core(const HttpLimits& limits, Work work) : limits_(limits), work_(std::move(work)) {}
 
   void setLimits(const HttpLimits& limits) {
     const std::lock_guard lock(mutex_);
@@ -51,7 +50,7 @@ class Workers::Core : public WaitListener, public std::enable_shared_from_this<C
 
   std::optional<Refusal> submit(const std::shared_ptr<HttpExchange>& exchange, Connections& connections);
   void sweep();
-  void giveUp(const std::shared_ptr<HttpExchange>& exchange, const std::string& why);
+  void giveUp(const std::shared_ptr<HttpExchange>& exchange, const Refusal& answer);
   std::vector<std::shared_ptr<HttpExchange>> exchanges() const;
   std::size_t inFlight() const;
   void stop();
@@ -76,7 +75,6 @@ class Workers::Core : public WaitListener, public std::enable_shared_from_this<C
   std::condition_variable thread_ended_;
   HttpLimits limits_;
   const Work work_;
-  const LateAnswer lateAnswer_;
   std::deque<std::shared_ptr<HttpExchange>> queue_;
   std::vector<std::shared_ptr<HttpExchange>> inFlight_;  ///< those of queue_ too
   std::size_t threads_ = 0;
@@ -265,16 +263,16 @@ void Workers::Core::sweep() {
     const auto worked = each->worked();
     const bool waits = worked == Clock::duration();
     if (worked > most) {
-      giveUp(each, "the provider did not return within " + std::to_string(most.count()) + " ms");
+      giveUp(each, {500, "the provider did not return within " + std::to_string(most.count()) + " ms", {}});
     } else if (waits && each->client->inPhase() > most) {
-      giveUp(each, "no worker was free for it");
+      giveUp(each, overloaded("no worker was free for it"));
     }
   }
 }
 
-void Workers::Core::giveUp(const std::shared_ptr<HttpExchange>& exchange, const std::string& why) {
-  if (!exchange->giveUp([&](ResponseSink& sink) { lateAnswer_(exchange->request, why, sink); })) return;
-  ZORVA_LOG(Error, nameOf(*exchange) + ": " + why + "; given up");
+void Workers::Core::giveUp(const std::shared_ptr<HttpExchange>& exchange, const Refusal& answer) {
+  if (!exchange->giveUp(answer)) return;
+  ZORVA_LOG(Error, nameOf(*exchange) + ": " + answer.why + "; given up");
   const std::lock_guard lock(mutex_);
   if (exchange->place == std::string::npos) return;  // it came to its end just now
   forget(*exchange);
@@ -301,8 +299,7 @@ bool Workers::Core::join(std::chrono::milliseconds most) {
   return thread_ended_.wait_for(lock, most, [this] { return threads_ == 0; });
 }
 
-Workers::Workers(const HttpLimits& limits, Work work, LateAnswer lateAnswer)
-    : core_(std::make_shared<Core>(limits, std::move(work), std::move(lateAnswer))) {}
+Workers::Workers(const HttpLimits& limits, Work work) : core_(std::make_shared<Core>(limits, std::move(work))) {}
 
 Workers::~Workers() {
   giveUpAll();
@@ -321,7 +318,7 @@ std::size_t Workers::inFlight() const { return core_->inFlight(); }
 
 void Workers::giveUpAll() {
   core_->stop();
-  for (const auto& each : core_->exchanges()) core_->giveUp(each, "the server is ending");
+  for (const auto& each : core_->exchanges()) core_->giveUp(each, overloaded("the server is ending"));
 }
 
 bool Workers::join(std::chrono::milliseconds most) { return core_->join(most); }

@@ -20,10 +20,8 @@ namespace zorva::server {
 class Workers {
  public:
   using Work = std::function<void(HttpExchange&)>;
-  /// Writes the answer to a request that is given up, for that reason.
-  using LateAnswer = std::function<void(const HttpRequest&, const std::string& why, ResponseSink&)>;
 
-  Workers(const HttpLimits& limits, Work work, LateAnswer lateAnswer);
+  Workers(const HttpLimits& limits, Work work);
 
   /// Waits for all threads that are not stuck in a provider; these must not outlive what `work` uses: see drain().
   ~Workers();
