@@ -157,6 +157,7 @@ void readHttp(Config& config, const toml::table& document) {
 void readPull(Config& config, const toml::table& document) {
   TableReader pull(config.file, document, "pull");
   pull.take("contexts", config.pullContexts, 0, 10'000);
+  pull.take("client_contexts", config.pullClientContexts, 1, 10'000);
   pull.take("default_seconds", config.pullSeconds, 1, kLongestSeconds);
   pull.take("longest_seconds", config.pullLongestSeconds, 1, kLongestSeconds);
   pull.take("memory_mib", config.pullMebibytes, 1, 16 * 1024);

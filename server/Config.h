@@ -32,6 +32,7 @@ struct Config {
 
   // [pull]
   int pullContexts = 100;        ///< enumerations that are open at once
+  int pullClientContexts = 25;   ///< of these, of one client
   int pullSeconds = 60;          ///< how long one stays open unasked where the client says nothing
   int pullLongestSeconds = 600;  ///< the longest that a client may ask for
   int pullMebibytes = 64;        ///< what all of them hold

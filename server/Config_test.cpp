@@ -61,6 +61,7 @@ threads = 3
 gzip = false
 [pull]
 contexts = 4
+client_contexts = 3
 default_seconds = 5
 longest_seconds = 6
 memory_mib = 7
@@ -88,6 +89,7 @@ target = "server.log"
   EXPECT_EQ(config.threads, 3);
   EXPECT_FALSE(config.limits.gzip);
   EXPECT_EQ(config.pullContexts, 4);
+  EXPECT_EQ(config.pullClientContexts, 3);
   EXPECT_EQ(config.pullSeconds, 5);
   EXPECT_EQ(config.pullLongestSeconds, 6);
   EXPECT_EQ(config.pullMebibytes, 7);
@@ -111,7 +113,7 @@ TEST_F(ServerConfig, TheExampleHasEveryKeyWithItsDefault) {
     text += line.substr(2) + "\n";
     ++keys;
   }
-  EXPECT_EQ(keys, 23U);
+  EXPECT_EQ(keys, 24U);
   const Config config = read(text);
   const Config defaults;
   EXPECT_EQ(config.port, defaults.port);
@@ -130,6 +132,7 @@ TEST_F(ServerConfig, TheExampleHasEveryKeyWithItsDefault) {
   EXPECT_EQ(config.limits.gzip, defaults.limits.gzip);
   EXPECT_EQ(config.threads, defaults.threads);
   EXPECT_EQ(config.pullContexts, defaults.pullContexts);
+  EXPECT_EQ(config.pullClientContexts, defaults.pullClientContexts);
   EXPECT_EQ(config.pullSeconds, defaults.pullSeconds);
   EXPECT_EQ(config.pullLongestSeconds, defaults.pullLongestSeconds);
   EXPECT_EQ(config.pullMebibytes, defaults.pullMebibytes);

@@ -50,7 +50,8 @@ bool hasHungUp(int socket) {
 
 }  // namespace
 
-Connection::Connection(int socket, std::string peer) : peer_(std::move(peer)), state_(0), socket_(socket) {
+Connection::Connection(int socket, std::string peer, std::string client)
+    : peer_(std::move(peer)), client_(std::move(client)), state_(0), socket_(socket) {
   enter(Phase::Arriving);
 }
 
@@ -64,8 +65,8 @@ milliseconds Connection::inPhase() const noexcept {
   return milliseconds(now > since ? now - since : 0);
 }
 
-void Connections::add(int socket, std::string peer) {
-  auto connection = std::make_shared<Connection>(socket, std::move(peer));
+void Connections::add(int socket, std::string peer, std::string client) {
+  auto connection = std::make_shared<Connection>(socket, std::move(peer), std::move(client));
   const std::lock_guard lock(mutex_);
   connection->place_ = connections_.size();
   connections_.push_back(std::move(connection));

@@ -26,9 +26,12 @@ enum class Phase : std::uint8_t {
 /// One connection. `socket` belongs to the HTTP library, which closes it; here it is only shut down.
 class Connection {
  public:
-  Connection(int socket, std::string peer);
+  Connection(int socket, std::string peer, std::string client);
 
   const std::string& peer() const noexcept { return peer_; }
+
+  /// Whose connection it is: see clientOf().
+  const std::string& client() const noexcept { return client_; }
 
   /// Enters a phase, or tells that something happened in it. A phase and its time are always read together.
   void enter(Phase phase) noexcept;
@@ -47,6 +50,7 @@ class Connection {
  private:
   friend class Connections;
   const std::string peer_;
+  const std::string client_;
   std::atomic<std::uint64_t> state_;  ///< milliseconds of the steady clock, times four, and the phase
   std::atomic<bool> proven_ = false;
   std::atomic<std::size_t> held_ = 0;
@@ -59,7 +63,7 @@ class Connection {
 class Connections {
  public:
   /// Before the socket is handed to the HTTP library.
-  void add(int socket, std::string peer);
+  void add(int socket, std::string peer, std::string client);
 
   /// The one that was added for a socket, which is open.
   std::shared_ptr<Connection> find(int socket) const;

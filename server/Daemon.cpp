@@ -78,6 +78,7 @@ ServiceOptions serviceOptions(const Config& config) {
   options.pullDefaultTimeout = std::chrono::seconds(config.pullSeconds);
   options.pullMaxTimeout = std::chrono::seconds(config.pullLongestSeconds);
   options.maxPulls = static_cast<std::size_t>(config.pullContexts);
+  options.maxPullsOfClient = static_cast<std::size_t>(config.pullClientContexts);
   options.maxPullBytes = static_cast<std::size_t>(config.pullMebibytes) << 20;
   return options;
 }

@@ -23,6 +23,7 @@ struct HttpRequest {
   HeaderList headers;
   std::string body;
   bool takesTrailers = false;  ///< the client said TE: trailers
+  std::string client = {};     ///< who sent it, for what is limited by client
 };
 
 /// Thrown by ResponseSink::write when the client has gone: nobody waits for the rest.

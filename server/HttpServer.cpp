@@ -16,6 +16,7 @@
 #include <thread>
 #include <utility>
 
+#include "server/ClientIdentity.h"
 #include "server/Connections.h"
 #include "server/HttpExchange.h"
 #include "server/Log.h"
@@ -133,7 +134,7 @@ void HttpServer::Core::take(int socket, const sockaddr_storage& peer, socklen_t 
     return;
   }
   // From here on, since the library tells of it later, on a thread of its own.
-  connections_.add(socket, addressText(peer));
+  connections_.add(socket, addressText(peer), clientOf(socket, peer));
   if (MHD_add_connection(daemon_, socket, reinterpret_cast<const sockaddr*>(&peer), peerSize) != MHD_YES) {
     ZORVA_LOG_CLIENT(Error, addressText(peer) + ": refused: " + std::strerror(errno));
     // The library has closed the socket.
@@ -207,6 +208,7 @@ MHD_Result HttpServer::Core::readHead(Holder& exchange, MHD_Connection* connecti
   requests_.fetch_add(1, std::memory_order_relaxed);
   HttpRequest& request = exchange->request;
   request.method = method;
+  request.client = exchange->client->client();
   request.headers.reserve(8);
   MHD_get_connection_values_n(
       connection, MHD_HEADER_KIND,

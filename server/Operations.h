@@ -23,6 +23,7 @@ struct Operation {
   const broker::Caller& caller;
   const cimxml::Call& call;
   cimxml::ResponseWriter& writer;
+  const std::string& client;    ///< HttpRequest::client
   std::string_view hostHeader;  ///< as the client named this host
   std::string nameSpace;        ///< as the registry spells it
 

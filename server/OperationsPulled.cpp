@@ -49,8 +49,7 @@ Status takeOpening(Operation& operation, Arguments& arguments, Opening& opening)
             "an enumeration ends at its first error; leave out "
             "ContinueOnError"};
   status = takeTimeout(operation.pulls.limits(), timeout, opening.timeout);
-  if (status.ok()) status = takeCount(operation.pulls.limits(), count, opening.count);
-  return status.ok() ? operation.pulls.room() : status;
+  return status.ok() ? takeCount(operation.pulls.limits(), count, opening.count) : status;
 }
 
 /// The objects that are handed out, then whether there are more, and where.
@@ -103,7 +102,7 @@ class Collector {
     std::string context;
     const bool ended = objects_.size() == 0;
     if (!ended) {
-      status = operation_.pulls.keep(form, operation_.nameSpace, objects_, opening.timeout, context);
+      status = operation_.pulls.keep(operation_.client, form, operation_.nameSpace, objects_, opening.timeout, context);
       if (!status.ok()) return status;
     }
     write(operation_, first, ended, context);

@@ -2,6 +2,7 @@
 
 #include <sys/random.h>
 
+#include <algorithm>
 #include <utility>
 
 #include "schema/Schema.h"
@@ -35,10 +36,7 @@ PullObjects::~PullObjects() { table_.bytes_ -= bytes_; }
 
 bool PullObjects::add(std::string_view text) {
   const std::size_t size = text.size() + kOverhead;
-  if (table_.bytes_.fetch_add(size) + size > table_.limits_.maxBytes) {
-    table_.bytes_ -= size;
-    return false;
-  }
+  if (!table_.takeBytes(size, bytes_)) return false;
   bytes_ += size;
   texts_.emplace_back(text);
   return true;
@@ -54,26 +52,75 @@ void PullObjects::moveTo(PullObjects& taken, std::size_t count) {
   }
 }
 
-broker::Status PullTable::room(Clock::time_point now) {
-  const std::lock_guard lock(mutex_);
-  dropOld(now);
-  if (open_.size() < limits_.maxOpen) return {};
-  return {kServerLimitsExceeded, std::to_string(open_.size()) +
-                                     " enumerations are open, and no more are allowed; close one, or try again later"};
+/// Of the clients whose enumerations weigh most together, the one that has waited longest; `weight` gets what those of
+/// its client weigh. The end where none is open.
+PullTable::Map::iterator PullTable::nextToGiveWay(Weight weightOf, std::size_t& weight) {
+  std::map<std::string_view, std::size_t> weights;
+  for (const auto& [context, open] : open_) weights[open.client] += weightOf(open);
+  weight = 0;
+  for (const auto& [client, all] : weights) weight = std::max(weight, all);
+  return longestWaiting([&](const Open& open) { return weights[open.client] == weight; });
 }
 
-broker::Status PullTable::keep(PullForm form, std::string_view nameSpace, PullObjects& rest,
+template <class Predicate>
+PullTable::Map::iterator PullTable::longestWaiting(Predicate&& isMeant) {
+  auto longest = open_.end();
+  for (auto each = open_.begin(); each != open_.end(); ++each) {
+    if (!isMeant(each->second)) continue;
+    if (longest == open_.end() || each->second.waitsSince < longest->second.waitsSince) longest = each;
+  }
+  return longest;
+}
+
+/// Takes a share of the bytes for an enumeration that is being collected and holds `held`. Clients that hold more than
+/// it does give way; no other, so that one large enumeration does not end those of everybody.
+bool PullTable::takeBytes(std::size_t size, std::size_t held) {
+  const auto fits = [&] {
+    if (bytes_.fetch_add(size) + size <= limits_.maxBytes) return true;
+    bytes_ -= size;
+    return false;
+  };
+  if (fits()) return true;
+  const std::lock_guard lock(mutex_);
+  while (!fits()) {
+    std::size_t most = 0;
+    const auto next = nextToGiveWay([](const Open& open) { return open.objects.bytes(); }, most);
+    if (next == open_.end() || most <= held) return false;
+    open_.erase(next);
+  }
+  return true;
+}
+
+/// Makes room for one more of a client.
+void PullTable::makeRoomFor(const std::string& client) {
+  const auto isOwn = [&](const Open& open) { return open.client == client; };
+  const auto own = std::count_if(open_.begin(), open_.end(), [&](const auto& entry) { return isOwn(entry.second); });
+  std::size_t most = 0;
+  if (static_cast<std::size_t>(own) >= limits_.maxOpenOfClient) {
+    open_.erase(longestWaiting(isOwn));
+  } else if (open_.size() >= limits_.maxOpen) {
+    open_.erase(nextToGiveWay([](const Open&) { return std::size_t{1}; }, most));
+  }
+}
+
+broker::Status PullTable::keep(const std::string& client, PullForm form, std::string_view nameSpace, PullObjects& rest,
                                std::chrono::seconds timeout, std::string& context, Clock::time_point now) {
-  broker::Status status = room(now);
-  if (!status.ok()) return status;
+  if (limits_.maxOpen == 0) {
+    return {kServerLimitsExceeded,
+            "no enumeration is kept here: ask for all objects at once, or enumerate without pulling"};
+  }
   context = newContext();
   const std::lock_guard lock(mutex_);
+  dropOld(now);
+  makeRoomFor(client);
   Open& open = open_.try_emplace(context, *this).first->second;
+  open.client = client;
   open.form = form;
   open.nameSpace = nameSpace;
   rest.moveTo(open.objects, rest.size());
   open.timeout = timeout;
   open.deadline = now + timeout;
+  open.waitsSince = now;
   return {};
 }
 
@@ -82,7 +129,7 @@ broker::Status PullTable::find(const std::string& context, std::string_view name
   if (found != open_.end() && schema::sameNamespace(found->second.nameSpace, nameSpace)) return {};
   return {kInvalidEnumerationContext,
           "there is no such open enumeration in " + std::string(nameSpace) +
-              ": it has ended, was closed, or was left alone for longer than its OperationTimeout"};
+              ": it has ended, was closed, was left alone for longer than its OperationTimeout, or gave way to others"};
 }
 
 broker::Status PullTable::take(const std::string& context, std::string_view nameSpace, PullForm form, std::size_t count,
@@ -99,6 +146,13 @@ broker::Status PullTable::take(const std::string& context, std::string_view name
                                             : "the enumeration gives instances: use "
                                               "PullInstancesWithPath"};
   }
+  if (count == 0 && open.emptyPulls == limits_.maxEmptyPulls) {
+    return {kServerLimitsExceeded,
+            "more than " + std::to_string(limits_.maxEmptyPulls) +
+                " pulls of zero objects, one after another; the OperationTimeout is not renewed"};
+  }
+  open.emptyPulls = count == 0 ? open.emptyPulls + 1 : 0;
+  if (count > 0) open.waitsSince = now;
   open.objects.moveTo(taken, count);
   ended = open.objects.size() == 0;
   open.deadline = now + open.timeout;

@@ -19,17 +19,35 @@ using ::testing::Not;
 using ::testing::StartsWith;
 using testing::text;
 
+PullLimits fewOpen() {
+  PullLimits limits;
+  limits.maxOpen = 4;
+  limits.maxOpenOfClient = 3;
+  limits.maxEmptyPulls = 5;
+  limits.maxBytes = 1000;
+  return limits;
+}
+
 class PullTableTest : public ::testing::Test {
  protected:
-  PullTableTest() : table_({seconds(60), seconds(600), 2, 100, 1000}) {}
-
-  std::string open(const std::vector<std::string>& objects, PullForm form = PullForm::Paths) {
+  std::string open(const std::vector<std::string>& objects, PullForm form = PullForm::Paths,
+                   const std::string& client = "user 1") {
     PullObjects rest(table_);
     for (const std::string& object : objects) EXPECT_TRUE(rest.add(object));
     std::string context;
-    const broker::Status status = table_.keep(form, "root/cimv2", rest, seconds(10), context, now_);
+    now_ += std::chrono::milliseconds(1);
+    const broker::Status status = table_.keep(client, form, "root/cimv2", rest, seconds(10), context, now_);
     EXPECT_TRUE(status.ok()) << status.message;
     return context;
+  }
+
+  std::string openAs(const std::string& client, const std::string& object = "a") {
+    return open({object, object}, PullForm::Paths, client);
+  }
+
+  bool isOpen(const std::string& context) {
+    std::uint64_t left = 0;
+    return table_.count(context, "root/cimv2", left, now_).ok();
   }
 
   std::vector<std::string> take(const std::string& context, std::size_t count) {
@@ -38,7 +56,7 @@ class PullTableTest : public ::testing::Test {
     return {taken.texts().begin(), taken.texts().end()};
   }
 
-  PullTable table_;
+  PullTable table_{fewOpen()};
   PullTable::Clock::time_point now_ = PullTable::Clock::now();
   broker::Status status_;
   bool ended_ = false;
@@ -55,12 +73,13 @@ TEST_F(PullTableTest, GivesObjectsInOrderUntilNoneAreLeft) {
 }
 
 TEST_F(PullTableTest, KeepsWhatIsAskedForInTime) {
-  const std::string context = open({"a", "b"});
+  const std::string context = open({"a", "b", "c"});
   for (int i = 0; i < 5; ++i) {
     now_ += seconds(9);
     take(context, 0);
     EXPECT_TRUE(status_.ok());
   }
+  EXPECT_EQ(take(context, 1).size(), 1U);
   now_ += seconds(10);
   take(context, 1);
   EXPECT_EQ(status_.rc, kInvalidEnumerationContext);
@@ -78,12 +97,79 @@ TEST_F(PullTableTest, DropsWhatNobodyComesBackFor) {
   EXPECT_EQ(table_.bytes(), 0U);
 }
 
-TEST_F(PullTableTest, BoundsHowManyAreOpen) {
-  open({"a"});
-  open({"b"});
-  EXPECT_EQ(table_.room(now_).rc, kServerLimitsExceeded);
-  now_ += seconds(11);
-  EXPECT_TRUE(table_.room(now_).ok());
+TEST_F(PullTableTest, PullsOfNothingRenewTheTimeoutOnlySoOften) {
+  const std::string context = open({"a", "b"});
+  for (int i = 0; i < 5; ++i) take(context, 0);
+  take(context, 1);
+  for (int i = 0; i < 5; ++i) {
+    take(context, 0);
+    EXPECT_TRUE(status_.ok()) << "a pull of objects begins the count anew";
+  }
+  now_ += seconds(9);
+  take(context, 0);
+  EXPECT_EQ(status_.rc, kServerLimitsExceeded);
+  EXPECT_THAT(status_.message, HasSubstr("more than 5 pulls of zero objects"));
+  EXPECT_TRUE(isOpen(context));
+  now_ += seconds(1);
+  EXPECT_FALSE(isOpen(context)) << "the pull that was refused has renewed nothing";
+}
+
+TEST_F(PullTableTest, OfAClientThatHasAsManyAsItMayTheOneThatWaitedLongestGivesWay) {
+  const std::string other = openAs("user 2");
+  const std::string first = openAs("user 1");
+  const std::string second = openAs("user 1");
+  const std::string third = openAs("user 1");
+  now_ += std::chrono::milliseconds(1);
+  EXPECT_EQ(take(first, 1).size(), 1U);
+  now_ += std::chrono::milliseconds(1);
+  take(second, 0);
+  const std::string fourth = openAs("user 1");
+  EXPECT_FALSE(isOpen(second)) << "a pull of nothing is no end of waiting";
+  for (const std::string& context : {other, first, third, fourth}) EXPECT_TRUE(isOpen(context));
+}
+
+TEST_F(PullTableTest, WhereTheTableIsFullTheClientThatHasMostGivesWay) {
+  const std::string oldest = openAs("user 2");
+  const std::string first = openAs("user 1");
+  const std::string second = openAs("user 1");
+  const std::string third = openAs("user 1");
+  const std::string fresh = openAs("user 3");
+  EXPECT_FALSE(isOpen(first));
+  for (const std::string& context : {oldest, second, third, fresh}) EXPECT_TRUE(isOpen(context));
+  openAs("user 4");
+  EXPECT_FALSE(isOpen(second));
+  openAs("user 5");
+  EXPECT_FALSE(isOpen(oldest)) << "of clients that have as many, the one that waited longest";
+  EXPECT_EQ(table_.openCount(), 4U);
+}
+
+TEST_F(PullTableTest, WhereTheMemoryIsFullTheClientThatHoldsMostGivesWay) {
+  const std::string large = openAs("user 1", std::string(236, 'x'));
+  const std::string small = openAs("user 2", std::string(36, 'x'));
+  const std::string fresh = openAs("user 3", std::string(136, 'x'));
+  EXPECT_FALSE(isOpen(large));
+  EXPECT_TRUE(isOpen(small));
+  EXPECT_TRUE(isOpen(fresh));
+  EXPECT_EQ(table_.bytes(), 600U);
+}
+
+TEST_F(PullTableTest, AnEnumerationThatIsTooLargeEndsNoSmallerOne) {
+  const std::string small = openAs("user 1", std::string(36, 'x'));
+  PullObjects huge(table_);
+  int added = 0;
+  while (huge.add(std::string(36, 'x'))) ++added;
+  EXPECT_EQ(added, 8);
+  EXPECT_TRUE(isOpen(small));
+}
+
+TEST(PullTableOff, KeepsNone) {
+  PullLimits limits;
+  limits.maxOpen = 0;
+  PullTable table(limits);
+  PullObjects rest(table);
+  ASSERT_TRUE(rest.add("a"));
+  std::string context;
+  EXPECT_EQ(table.keep("", PullForm::Paths, "n", rest, seconds(1), context).rc, kServerLimitsExceeded);
 }
 
 TEST_F(PullTableTest, BoundsTheirMemory) {
@@ -115,11 +201,11 @@ TEST_F(PullTableTest, NamesContextsSoThatNobodyCanGuessThem) {
 }
 
 TEST(PullThreads, ManyMayPullAtOnce) {
-  PullTable table({seconds(60), seconds(600), 100, 100, 1'000'000});
+  PullTable table{PullLimits()};
   PullObjects rest(table);
   for (int i = 0; i < 1000; ++i) ASSERT_TRUE(rest.add("x"));
   std::string context;
-  ASSERT_TRUE(table.keep(PullForm::Paths, "n", rest, seconds(60), context).ok());
+  ASSERT_TRUE(table.keep("", PullForm::Paths, "n", rest, seconds(60), context).ok());
   std::atomic<std::size_t> got = 0;
   std::vector<std::thread> threads;
   for (int i = 0; i < 4; ++i) {
@@ -227,14 +313,32 @@ TEST(PulledOperations, RefuseWhatTheyDoNotOffer) {
 
 TEST(PulledOperations, StayWithinTheLimitsOfTheServer) {
   ServiceOptions options;
-  options.maxPulls = 1;
-  testing::TestService few(options);
-  const std::string thing = className("ClassName", "T_Thing");
-  EXPECT_THAT(few.ask("OpenEnumerateInstances", thing), HasSubstr(kMore));
-  EXPECT_THAT(few.ask("OpenEnumerateInstances", thing), HasSubstr("<ERROR CODE=\"27\""));
   options.maxPullBytes = 1500;
   testing::TestService small(options);
-  EXPECT_THAT(small.ask("OpenEnumerateInstances", thing), HasSubstr("hold more than 1500 bytes"));
+  EXPECT_THAT(small.ask("OpenEnumerateInstances", className("ClassName", "T_Thing")),
+              HasSubstr("hold more than 1500 bytes"));
+}
+
+TEST(PulledOperations, ThatFitTheirFirstAnswerNeedNoPlace) {
+  ServiceOptions options;
+  options.maxPulls = 1;
+  testing::TestService service(options);
+  const std::string context = contextOf(service.ask("OpenEnumerateInstances", className("ClassName", "T_Thing")));
+  const std::string whole = className("ClassName", "T_Thing") + text("MaxObjectCount", "3");
+  EXPECT_THAT(service.ask("OpenEnumerateInstances", whole), HasSubstr(kEnd));
+  EXPECT_THAT(service.ask("PullInstancesWithPath", pull(context, 1)), HasSubstr(kMore)) << "and end no other";
+}
+
+TEST(PulledOperations, OfOneClientDoNotKeepOthersOut) {
+  testing::TestService service;
+  const auto openAs = [&](const std::string& client) {
+    HttpRequest request = testing::request("OpenEnumerateInstances", className("ClassName", "T_Thing"));
+    request.client = client;
+    return contextOf(service.ask(request).body);
+  };
+  const std::string one = openAs("user 1");
+  for (int i = 0; i < 150; ++i) EXPECT_NE(openAs("user 2"), "");
+  EXPECT_THAT(service.ask("PullInstancesWithPath", pull(one, 1)), HasSubstr(kMore));
 }
 
 }  // namespace

@@ -47,6 +47,7 @@ PullLimits pullLimits(const ServiceOptions& options) {
   limits.defaultTimeout = options.pullDefaultTimeout;
   limits.maxTimeout = options.pullMaxTimeout;
   limits.maxOpen = options.maxPulls;
+  limits.maxOpenOfClient = options.maxPullsOfClient;
   limits.maxObjects = options.maxPullObjects;
   limits.maxBytes = options.maxPullBytes;
   return limits;
@@ -134,7 +135,7 @@ class ServiceCore {
     caller.acceptLanguage = headers.acceptLanguage;
     caller.contentLanguage = headers.contentLanguage;
     sink.setLateAnswer(lateAnswer(request, headers));
-    answer(request, headers, caller, sink);
+    answer(request, headers, caller, http.client, sink);
   }
 
   void reclaim() { pulls_.reclaim(); }
@@ -162,7 +163,7 @@ class ServiceCore {
   }
 
   void answer(const cimxml::CimRequest& request, const CimHeaders& headers, const broker::Caller& caller,
-              ResponseSink& sink) {
+              const std::string& client, ResponseSink& sink) {
     Buffer buffer;
     cimxml::ResponseWriter writer(buffer.text(), options_.unsentText, [&](std::string_view text) {
       if (!sink.begun()) sink.begin(200, responseHeaders(headers));
@@ -171,7 +172,7 @@ class ServiceCore {
     writer.beginMessage(request.id, request.isMultiple);
     for (const cimxml::Call& call : request.calls) {
       writer.beginResponse(call.name, call.isExtrinsic);
-      Operation operation{broker_, pulls_, host_, caller, call, writer, headers.host, {}};
+      Operation operation{broker_, pulls_, host_, caller, call, writer, client, headers.host, {}};
       const Status status = carryOutSafely(operation);
       if (!status.ok()) {
         const std::string text(broker::statusName(status.rc));

@@ -30,6 +30,7 @@ struct ServiceOptions {
   std::chrono::seconds pullDefaultTimeout{60};
   std::chrono::seconds pullMaxTimeout{600};  ///< a longer one is refused, and so is none at all
   std::size_t maxPulls = 100;                ///< open at once
+  std::size_t maxPullsOfClient = 25;         ///< of these, of one client
   std::size_t maxPullObjects = 10000;        ///< the most objects that one pull may ask for
   std::size_t maxPullBytes = 64U << 20;      ///< what all open enumerations hold together, as response text
 };
