@@ -96,12 +96,9 @@ CMPIObjectPath* DNSClientObjFactory::get_assoc_targetClass_ObjectPath(const CMPI
                                                                       const char* _RefRightClass, CMPIStatus* rc) {
   logEntry(loggerDNSObjFactory, ZV_HERE, " _broker=", _broker, " ref=", ref, " _RefLeftClass=", _RefLeftClass,
            " _RefRightClass=", _RefRightClass, " rc=", rc);
-  CMPIObjectPath* path = nullptr;
   const char* targetClass = get_assoc_targetClass_Name(_broker, ref, _RefLeftClass, _RefRightClass, rc);
-  if (*targetClass != '\0') path = newHostPath(_broker, nameSpaceOf(ref, rc), targetClass, rc);
-  logExit(loggerDNSObjFactory, ZV_HERE, " _broker=", _broker, " ref=", ref, " _RefLeftClass=", _RefLeftClass,
-          " _RefRightClass=", _RefRightClass, " rc=", rc);
-  return path;
+  if (*targetClass == '\0') return nullptr;
+  return newHostPath(_broker, nameSpaceOf(ref, rc), targetClass, rc);
 }
 
 unsigned short DNSClientObjFactory::getDNSClientCMPIInstanceFromIPInterface(const CMPIBroker* _broker,
@@ -115,8 +112,6 @@ unsigned short DNSClientObjFactory::getDNSClientCMPIInstanceFromIPInterface(cons
   if (found != dnsClientMap.end()) {
     instance = makeDNSClientInstance(_broker, ref, found->second, properties, isObjPath, rc);
   }
-  logExit(loggerDNSObjFactory, ZV_HERE, " _broker=", _broker, " ref=", ref, " interfaceName=", &interfaceName,
-          " instance=", instance, " isObjPath=", isObjPath, " properties=", properties, " rc=", rc);
   return 0;
 }
 

@@ -12,20 +12,18 @@ static const char* const dnsSettingDataClass = "ZORVA_DNSSettingData";
 unsigned short getAllDNSSettingDataCMPIObjectPaths(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                                    std::vector<CMPIObjectPath*>* paths, CMPIStatus* status) {
   logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " paths=", paths, " status=", status);
-  unsigned short failed = 0;
   for (DNSSettingData data; data; ++data) {
     CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, nullptr), dnsSettingDataClass, nullptr);
     if (!isGood(path)) {
       logError(loggerDNSObjFactory, ZV_HERE, "getAllDNSSettingDataCMPIObjectPaths failed");
-      failed = 1;
-      break;
+      logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " paths=", paths, " status=", status);
+      return 1;
     }
     std::string instanceID;
     if (data.getInstanceID(instanceID)) addTextKey(path, "InstanceID", instanceID);
     paths->push_back(path);
   }
-  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " paths=", paths, " status=", status);
-  return failed;
+  return 0;  // an exit is marked where it fails, and nowhere else
 }
 
 namespace {
@@ -135,8 +133,6 @@ unsigned short getAllDNSSettingDataCMPIInstances(const CMPIBroker* broker, const
   for (DNSSettingData data; data; ++data) {
     instances->push_back(makeDNSSettingDataInstance(broker, ref, data, properties, false, status));
   }
-  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
-          " instances=", instances, " status=", status);
   return 0;
 }
 

@@ -198,8 +198,6 @@ unsigned int modifyDNSProtocolEndpointCMPIInstance(const CMPIBroker* broker, con
     logError(loggerDNSObjFactory, ZV_HERE, "Caught Exception : ");
     return CMPI_RC_ERR_FAILED;
   }
-  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
-          " instance=", instance, " status=", status);
   return CMPI_RC_OK;
 }
 

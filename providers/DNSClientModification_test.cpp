@@ -77,8 +77,7 @@ TEST_F(DNSClientModification, SetsTheThreeValuesOfTheNodeInTheirOrder) {
                           "log 3000 ENTERING modifyDNSProtocolEndpointCMPIInstance," + parameters,
                           "log 4000 VARIABLE nameKey = eth0", "log 4000 VARIABLE name = eth0",
                           "log 4000 VARIABLE dnsSuffixes.size() = 2", "log 4000 VARIABLE domainName = new.example.org",
-                          "log 4000 VARIABLE hostName = newhost", "log 4000 VARIABLE name = eth1",
-                          "log 3000 EXITING modifyDNSProtocolEndpointCMPIInstance," + parameters, "returnDone()"));
+                          "log 4000 VARIABLE hostName = newhost", "log 4000 VARIABLE name = eth1", "returnDone()"));
   EXPECT_THAT(outcome.calls.lines(),
               ElementsAre("ref.getKey(\"Name\")", "string \"eth0\".getCharPtr()",
                           "instance.getProperty(\"DNSSuffixesToAppend\")", "A1.getSize()", "A1.getElementAt(0)",

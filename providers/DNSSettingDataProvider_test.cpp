@@ -112,11 +112,8 @@ TEST_F(DNSSettingDataProviderTest, EnumeratedInstancesAreMadeFirstAndHandedOutTh
           "I2.setProperty(\"DNSServerAddresses\", string[] {\"a\", \"b\"})", "newArray(3, uint16)",
           "A4.setElementAt(0, uint16 8)", "A4.setElementAt(1, uint16 14)", "A4.setElementAt(2, uint16 17)",
           "I2.setProperty(\"DHCPOptionsToUse\", uint16[] {8, 14, 17})",
-          "log 3000 EXITING makeDNSSettingDataInstance," + kMakeParameters,
-          "log 3000 EXITING getAllDNSSettingDataCMPIInstances, broker=ADDR ref=ADDR properties=0 instances=ADDR "
-          "status=ADDR",
-          "returnInstance(I1)", "returnInstance(I2)", "returnDone()", "log 4000 EXITING DNSSettingData_EnumInstances",
-          "log 4000 banner"));
+          "log 3000 EXITING makeDNSSettingDataInstance," + kMakeParameters, "returnInstance(I1)", "returnInstance(I2)",
+          "returnDone()", "log 4000 EXITING DNSSettingData_EnumInstances", "log 4000 banner"));
 }
 
 TEST_F(DNSSettingDataProviderTest, EnumeratedNamesAreMadeFirstAndHandedOutThen) {
@@ -133,8 +130,7 @@ TEST_F(DNSSettingDataProviderTest, EnumeratedNamesAreMadeFirstAndHandedOutThen) 
                           "OP2.setNameSpace(\"root/other\")", "OP2.setHostname(\"host1\")", fileLine("bmc0"),
                           "newObjectPath(\"root/other\", \"ZORVA_DNSSettingData\")", "OP3.setNameSpace(\"root/other\")",
                           "OP3.setHostname(\"host1\")", "OP3.addKey(\"InstanceID\", chars \"BMC%bmc0\")",
-                          "log 3000 EXITING getAllDNSSettingDataCMPIObjectPaths," + parameters, "returnObjectPath(OP1)",
-                          "returnObjectPath(OP2)", "returnObjectPath(OP3)", "returnDone()",
+                          "returnObjectPath(OP1)", "returnObjectPath(OP2)", "returnObjectPath(OP3)", "returnDone()",
                           "log 4000 EXITING DNSSettingData_EnumInstanceNames", "log 4000 banner"));
 }
 
