@@ -57,12 +57,29 @@ std::optional<std::string> nameOf(const CMPIObjectPath* path, Getter get) {
   return text;
 }
 
+// The value alone says whether one is there: servers leave any state beside a good value.
+bool isNull(const CMPIData& data) {
+  switch (data.type) {
+    case CMPI_null:
+      return true;
+    case CMPI_chars:
+      return data.value.chars == nullptr;
+    case CMPI_string:
+      return isNull(data.value.string);
+    case CMPI_dateTime:
+      return isNull(data.value.dateTime);
+    default:
+      return false;
+  }
+}
+
 std::optional<Key> keyAt(const CMPIObjectPath* path, CMPICount index) {
   CMPIStatus status{CMPI_RC_OK, nullptr};
   CMPIString* name = nullptr;
   const CMPIData value = path->ft->getKeyAt(path, index, &name, &status);
   const auto text = textOf(name, status);
-  if (!text.has_value() || (value.state & (CMPI_notFound | CMPI_badValue)) != 0) return std::nullopt;
+  const bool isMissing = isNull(value) && (value.state & (CMPI_notFound | CMPI_badValue)) != 0;
+  if (!text.has_value() || isMissing) return std::nullopt;
   return Key{folded(*text), value};
 }
 
@@ -161,13 +178,11 @@ class Comparison {
  private:
   bool equalValues(const CMPIData& left, const CMPIData& right, const std::string& leftNameSpace,
                    const std::string& rightNameSpace, int depth) const {
-    const bool leftIsNull = (left.state & CMPI_nullValue) != 0;
-    const bool rightIsNull = (right.state & CMPI_nullValue) != 0;
     if (left.type == CMPI_ref || right.type == CMPI_ref) {
-      return comparesReferences_ && left.type == right.type && !leftIsNull && !rightIsNull &&
+      return comparesReferences_ && left.type == right.type &&
              equalPaths(left.value.ref, right.value.ref, leftNameSpace, rightNameSpace, depth + 1);
     }
-    if (leftIsNull || rightIsNull) return leftIsNull && rightIsNull;
+    if (isNull(left) || isNull(right)) return isNull(left) && isNull(right);
     if (isText(left.type) && isText(right.type)) return equalTexts(textOf(left), textOf(right));
     if (left.type != right.type) return false;
     if (left.type == CMPI_dateTime) return equalTexts(dateOf(left.value.dateTime), dateOf(right.value.dateTime));

@@ -66,6 +66,22 @@ TEST_F(ObjectPaths, AKeyWithoutValueEqualsOnlyAnotherWithout) {
   EXPECT_FALSE(equal(path_.key("N", null(CMPI_string)), path_.key("N", "")));
 }
 
+TEST_F(ObjectPaths, AStateBesideAGoodValueDoesNotCount) {
+  const Path link = Path("ZORVA_Link").key("A", ref(path_)).key("N", uint16(7)).key("T", "x").key("C", chars("y"));
+  const CMPIObjectPath* left = broker_.make(link);
+  for (const auto state :
+       std::initializer_list<CMPIValueState>{CMPI_nullValue, CMPI_keyValue, CMPI_badValue, CMPI_notFound}) {
+    RecordingBroker lying;
+    lying.addToAllStates(state);
+    EXPECT_TRUE(ZV::isObjPathsEqual(left, lying.make(link), true)) << state;
+    EXPECT_TRUE(ZV::isObjPathsEqual(lying.make(link), lying.make(link), true)) << state;
+    EXPECT_FALSE(ZV::isObjPathsEqual(lying.make(link), lying.make(link.key("T", "y")), true)) << state;
+    EXPECT_FALSE(ZV::isObjPathsEqual(lying.make(link), lying.make(link.key("T", null(CMPI_string))), true)) << state;
+    EXPECT_FALSE(ZV::isObjPathsEqual(lying.make(link), lying.make(link.key("A", ref(path_.key("Name", "eth1")))), true))
+        << state;
+  }
+}
+
 TEST_F(ObjectPaths, ReferencesAreComparedAsPathsOnlyWhereThatIsAskedFor) {
   const Path association = Path("ZORVA_Link").key("Antecedent", ref(path_));
   EXPECT_TRUE(equal(association, Path("ZORVA_Link").key("Antecedent", ref(path_)), true));

@@ -23,11 +23,9 @@ void set(const CMPIInstance* instance, const char* name, Member CMPIValue::*memb
 
 }  // namespace
 
-bool isPresent(const CMPIData& data) { return (data.state & (CMPI_nullValue | CMPI_notFound | CMPI_badValue)) == 0; }
+const CMPIString* stringOf(const CMPIData& data) { return data.type == CMPI_string ? data.value.string : nullptr; }
 
-const CMPIString* stringOf(const CMPIData& data) {
-  return isPresent(data) && data.type == CMPI_string ? data.value.string : nullptr;
-}
+const CMPIArray* arrayOf(const CMPIData& data) { return (data.type & CMPI_ARRAY) != 0 ? data.value.array : nullptr; }
 
 std::string textOf(const CMPIString* string, CMPIStatus* rc) {
   if (!isGood(string)) return {};
@@ -36,7 +34,7 @@ std::string textOf(const CMPIString* string, CMPIStatus* rc) {
 }
 
 std::string textOf(const CMPIData& data, CMPIStatus* rc) {
-  if (isPresent(data) && data.type == CMPI_chars && data.value.chars != nullptr) return data.value.chars;
+  if (data.type == CMPI_chars && data.value.chars != nullptr) return data.value.chars;
   return textOf(stringOf(data), rc);
 }
 
@@ -180,13 +178,13 @@ bool hasNext(const CMPIEnumeration* enumeration, CMPIStatus* rc) {
 CMPIObjectPath* nextPath(const CMPIEnumeration* enumeration, CMPIStatus* rc) {
   if (!isGood(enumeration)) return nullptr;
   const CMPIData data = enumeration->ft->getNext(enumeration, rc);
-  return isPresent(data) && data.type == CMPI_ref ? data.value.ref : nullptr;
+  return data.type == CMPI_ref ? data.value.ref : nullptr;
 }
 
 CMPIInstance* nextInstance(const CMPIEnumeration* enumeration, CMPIStatus* rc) {
   if (!isGood(enumeration)) return nullptr;
   const CMPIData data = enumeration->ft->getNext(enumeration, rc);
-  return isPresent(data) && data.type == CMPI_instance ? data.value.inst : nullptr;
+  return data.type == CMPI_instance ? data.value.inst : nullptr;
 }
 
 void returnInstance(const CMPIResult* result, const CMPIInstance* instance) {

@@ -22,11 +22,10 @@ bool isGood(const Object* object) {
   return object != nullptr && object->hdl != nullptr;
 }
 
-// Whether the datum holds a value: its state says neither null, nor bad, nor not found.
-bool isPresent(const CMPIData& data);
-
-// A key's or property's string object; null where the datum holds no value or one of another type.
+// The string or the array object in a datum; null where it holds none. The value alone says whether one is there:
+// servers leave any state beside a good value.
 const CMPIString* stringOf(const CMPIData& data);
+const CMPIArray* arrayOf(const CMPIData& data);
 
 std::string textOf(const CMPIString* string, CMPIStatus* rc);
 

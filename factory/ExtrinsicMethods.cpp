@@ -20,7 +20,7 @@ namespace {
 // The texts of an array argument. A missing array is an empty one; an element without text is left out.
 std::vector<std::string> textsOf(const CMPIData& data, CMPIStatus* rc) {
   std::vector<std::string> texts;
-  const CMPIArray* array = isPresent(data) && (data.type & CMPI_ARRAY) != 0 ? data.value.array : nullptr;
+  const CMPIArray* array = arrayOf(data);
   if (!isGood(array)) return texts;
   // NOLINTNEXTLINE(bugprone-too-small-loop-variable): the index is 16 bits wide, and the walk ends with its range
   for (unsigned short i = 0; i < array->ft->getSize(array, rc); ++i) {

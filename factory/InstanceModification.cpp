@@ -18,13 +18,24 @@ namespace ZV {
 
 namespace {
 
-bool isArray(const CMPIData& data) { return (data.type & CMPI_ARRAY) != 0; }
-
-// Whether the datum holds an object to read a text or a list from.
 bool holdsText(const CMPIData& data) {
-  return isPresent(data) && (isGood(stringOf(data)) || (data.type == CMPI_chars && data.value.chars != nullptr));
+  return isGood(stringOf(data)) || (data.type == CMPI_chars && data.value.chars != nullptr);
 }
-bool holdsList(const CMPIData& data) { return isPresent(data) && isArray(data) && isGood(data.value.array); }
+
+// Whether a property of the instance has a value. Here, and nowhere else, the state counts: a client sends null.
+bool isGiven(const CMPIData& data) { return (data.state & (CMPI_nullValue | CMPI_notFound)) == 0; }
+
+// Forgets the code of an earlier call: some brokers write none where a call succeeds.
+void expectSuccess(CMPIStatus* status) { *status = kStatusOk; }
+
+// False, with the code in the status, where the broker fails to give the text.
+bool readText(const CMPIData& data, std::string& text, CMPIStatus* status) {
+  if (data.type == CMPI_string) expectSuccess(status);
+  std::string read = textOf(data, status);
+  if (data.type == CMPI_string && status->rc != CMPI_RC_OK) return false;
+  text = std::move(read);
+  return true;
+}
 
 // The texts of a list's elements; one whose reading leaves a failing code in the status, or that has no text, is left
 // out.
@@ -32,12 +43,26 @@ std::vector<std::string> elementTexts(const CMPIArray* array, CMPIStatus* status
   std::vector<std::string> texts;
   const CMPICount count = array->ft->getSize(array, status);
   for (CMPICount i = 0; i < count; ++i) {
+    expectSuccess(status);
     const CMPIData element = array->ft->getElementAt(array, i, status);
+    std::string text;
     if (status->rc != CMPI_RC_OK || !holdsText(element)) continue;
-    std::string text = textOf(element, status);
-    if (status->rc == CMPI_RC_OK) texts.push_back(std::move(text));
+    if (readText(element, text, status)) texts.push_back(std::move(text));
   }
   return texts;
+}
+
+// The text of a property that has one; false, and text as it was, where it is null or cannot be read.
+bool takeText(const CMPIData& property, std::string& text, CMPIStatus* status) {
+  return isGiven(property) && holdsText(property) && readText(property, text, status);
+}
+
+// The same for a list.
+bool takeList(const CMPIData& property, std::vector<std::string>& texts, CMPIStatus* status) {
+  const CMPIArray* array = arrayOf(property);
+  if (!isGiven(property) || !isGood(array)) return false;
+  texts = elementTexts(array, status);
+  return true;
 }
 
 // The form of a list in an interface's file: one blank behind every element.
@@ -58,6 +83,7 @@ bool isMissing(const CMPIInstance* instance, const LogSite& site) {
 // A property of the instance as the modification of the setting data sees it: one that the broker fails to give does
 // not count.
 CMPIData givenProperty(const CMPIInstance* instance, const char* name, CMPIStatus* status) {
+  expectSuccess(status);
   CMPIData data = getProperty(instance, name, status);
   if (status->rc != CMPI_RC_OK) data.state = static_cast<CMPIValueState>(data.state | CMPI_notFound);
   return data;
@@ -75,6 +101,14 @@ bool findFile(const std::string& instanceID, std::string& fileName) {
   return false;
 }
 
+// An instance without a name empties the key; a name that the broker fails to give leaves it as it is.
+bool modifyConfigurationName(const std::string& fileName, const CMPIInstance* instance, CMPIStatus* status) {
+  const CMPIData property = givenProperty(instance, "ConfigurationName", status);
+  std::string name;
+  if (isGiven(property) && holdsText(property) && !readText(property, name, status)) return true;
+  return modifyDNSValue(fileName, "CONFIG_NAME", name);
+}
+
 }  // namespace
 
 unsigned int modifyDNSSettingDataCMPIInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
@@ -90,30 +124,24 @@ unsigned int modifyDNSSettingDataCMPIInstance(const CMPIBroker* broker, const CM
             " instance=", instance, " status=", status);
     return CMPI_RC_ERR_FAILED;
   }
-  const CMPIData hostname = givenProperty(instance, "RequestedHostname", status);
-  if (holdsText(hostname)) {
-    const std::string text = textOf(hostname, status);
-    if (!isValid(text)) return CMPI_RC_ERR_INVALID_PARAMETER;
-    modifyDNSValue(fileName, "HOSTNAME", text);
+  std::string hostname;
+  if (takeText(givenProperty(instance, "RequestedHostname", status), hostname, status)) {
+    if (!isValid(hostname)) return CMPI_RC_ERR_INVALID_PARAMETER;
+    modifyDNSValue(fileName, "HOSTNAME", hostname);
   }
-  const CMPIData domainName = givenProperty(instance, "DomainName", status);
-  if (holdsText(domainName)) {
-    const std::string text = textOf(domainName, status);
-    if (!isValid(text)) return CMPI_RC_ERR_INVALID_PARAMETER;  // the host name stays rewritten
-    modifyDNSValue(fileName, "DOMAINNAME", text);
+  std::string domainName;
+  if (takeText(givenProperty(instance, "DomainName", status), domainName, status)) {
+    if (!isValid(domainName)) return CMPI_RC_ERR_INVALID_PARAMETER;  // the host name stays rewritten
+    modifyDNSValue(fileName, "DOMAINNAME", domainName);
   }
-  const CMPIData addresses = givenProperty(instance, "DNSServerAddresses", status);
-  if (holdsList(addresses)) {
-    const std::vector<std::string> texts = elementTexts(addresses.value.array, status);
-    const std::string text = listText(texts);
+  std::vector<std::string> addresses;
+  if (takeList(givenProperty(instance, "DNSServerAddresses", status), addresses, status)) {
+    const std::string text = listText(addresses);
     logVariable(loggerDNSObjFactory, ZV_HERE, "dns_sfx", text);
-    logVariable(loggerDNSObjFactory, ZV_HERE, "dnsServers.size()", static_cast<unsigned int>(texts.size()));
+    logVariable(loggerDNSObjFactory, ZV_HERE, "dnsServers.size()", static_cast<unsigned int>(addresses.size()));
     modifyDNSValue(fileName, "DNSSERVERS", text);
   }
-  // Unlike the three above this key is emptied by an instance that lacks the property.
-  const CMPIData configurationName = givenProperty(instance, "ConfigurationName", status);
-  const std::string text = holdsText(configurationName) ? textOf(configurationName, status) : std::string();
-  if (modifyDNSValue(fileName, "CONFIG_NAME", text)) return CMPI_RC_OK;
+  if (modifyConfigurationName(fileName, instance, status)) return CMPI_RC_OK;
   logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
           " instance=", instance, " status=", status);
   return CMPI_RC_ERR_FAILED;
@@ -130,18 +158,17 @@ unsigned int modifyDNSGeneralSettingDataCMPIInstance(const CMPIBroker* broker, c
   DNSGeneralSettingData data;
   bool done = false;
   if (data) {
-    const CMPIData suffixes = getProperty(instance, "DNSSuffixesToAppend", status);
-    if (holdsList(suffixes)) {
-      const std::vector<std::string> texts = elementTexts(suffixes.value.array, status);
-      logVariable(loggerDNSObjFactory, ZV_HERE, "dnsSuffixes.size()", static_cast<unsigned int>(texts.size()));
+    std::vector<std::string> suffixes;
+    if (takeList(getProperty(instance, "DNSSuffixesToAppend", status), suffixes, status)) {
+      logVariable(loggerDNSObjFactory, ZV_HERE, "dnsSuffixes.size()", static_cast<unsigned int>(suffixes.size()));
       const std::string fileName = data.getFileName();
       logVariable(loggerDNSObjFactory, ZV_HERE, "fileName", fileName);
-      done = modifyDNSValue(fileName, "DNSSUFFIXES", listText(texts));
+      done = modifyDNSValue(fileName, "DNSSUFFIXES", listText(suffixes));
     }
   }
-  const CMPIData configurationName = getProperty(instance, "ConfigurationName", status);
-  if (holdsText(configurationName)) {
-    done = modifyDNSValue(data.getFileName(), "CONFIG_NAME", textOf(configurationName, status));
+  std::string configurationName;
+  if (takeText(getProperty(instance, "ConfigurationName", status), configurationName, status)) {
+    done = modifyDNSValue(data.getFileName(), "CONFIG_NAME", configurationName);
   } else {
     logError(loggerDNSObjFactory, ZV_HERE,
              "In modifyDNSGeneralSettingDataCMPIInstance function PROPERTY_CONFIGURATION_NAME does not found");
@@ -155,23 +182,20 @@ unsigned int modifyDNSGeneralSettingDataCMPIInstance(const CMPIBroker* broker, c
 namespace {
 
 void modifyNode(Instrumentation& node, const CMPIInstance* instance, const LogSite& site, CMPIStatus* status) {
-  const CMPIData suffixes = getProperty(instance, "DNSSuffixesToAppend", status);
-  if (holdsList(suffixes)) {
-    const std::vector<std::string> texts = elementTexts(suffixes.value.array, status);
-    logVariable(loggerDNSObjFactory, site, "dnsSuffixes.size()", static_cast<unsigned int>(texts.size()));
-    node.setProperty(NodeLexicon::PROP_DNS_SUFFIXES, std::vector<std::string>(texts));
+  std::vector<std::string> suffixes;
+  if (takeList(getProperty(instance, "DNSSuffixesToAppend", status), suffixes, status)) {
+    logVariable(loggerDNSObjFactory, site, "dnsSuffixes.size()", static_cast<unsigned int>(suffixes.size()));
+    node.setProperty(NodeLexicon::PROP_DNS_SUFFIXES, std::vector<std::string>(suffixes));
   }
-  const CMPIData domainName = getProperty(instance, "DomainName", status);
-  if (holdsText(domainName)) {
-    std::string text = textOf(domainName, status);
-    logVariable(loggerDNSObjFactory, site, "domainName", text);
-    node.setProperty(NodeLexicon::PROP_DOMAIN_NAME, text);
+  std::string domainName;
+  if (takeText(getProperty(instance, "DomainName", status), domainName, status)) {
+    logVariable(loggerDNSObjFactory, site, "domainName", domainName);
+    node.setProperty(NodeLexicon::PROP_DOMAIN_NAME, domainName);
   }
-  const CMPIData hostname = getProperty(instance, "Hostname", status);
-  if (holdsText(hostname)) {
-    std::string text = textOf(hostname, status);
-    logVariable(loggerDNSObjFactory, site, "hostName", text);
-    node.setProperty(NodeLexicon::PROP_HOST_NAME, text);
+  std::string hostname;
+  if (takeText(getProperty(instance, "Hostname", status), hostname, status)) {
+    logVariable(loggerDNSObjFactory, site, "hostName", hostname);
+    node.setProperty(NodeLexicon::PROP_HOST_NAME, hostname);
   }
 }
 

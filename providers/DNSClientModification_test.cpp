@@ -63,6 +63,23 @@ void expectFailed(const Outcome& outcome) {
   expectDoneWithoutExit(outcome);
 }
 
+// --- what counts as present
+
+TEST_F(DNSClientModification, TextsThatTheBrokerFailsToGiveLeaveWhatIsStored) {
+  for (const std::size_t call : {5U, 7U}) {  // that read the domain's name and the host's
+    for (const Mode mode : {Mode::SetRc, Mode::RcAndNull}) {
+      SCOPED_TRACE(std::to_string(call) + ' ' + nameOf(mode));
+      restore();
+      broker_.startOver();
+      broker_.failAt(call, mode);
+      const Outcome outcome = modify(kEmpty.with("DomainName", "new.example.org").with("Hostname", "newhost"));
+      EXPECT_EQ("getCharPtr", outcome.calls.at(call - 1).name);
+      EXPECT_THAT(node(0), ElementsAre("example.org", call == 5 ? "example.org" : "new.example.org",
+                                       call == 5 ? "newhost" : "host1"));
+    }
+  }
+}
+
 // --- a whole operation
 
 TEST_F(DNSClientModification, SetsTheThreeValuesOfTheNodeInTheirOrder) {

@@ -151,13 +151,22 @@ TEST_F(DNSGeneralSettingDataModification, AFailureGivesTheMessageThatTheBrokerLe
 }
 
 TEST_F(DNSGeneralSettingDataModification, ASuccessGivesTheBrokersCodeWithoutItsMessage) {
-  broker_.failEach("getProperty", Mode::SetRc);  // the properties are given all the same
-  broker_.failEach("getCharPtr", Mode::SetRc);
-  const Outcome outcome = modify(kEmpty.with("ConfigurationName", "home"));
+  broker_.failEach("getProperty", Mode::SetRc);  // the list is given all the same
+  const Outcome outcome = modify(kEmpty.with("DNSSuffixesToAppend", texts({"a"})));
   EXPECT_EQ(CMPI_RC_ERR_FAILED, outcome.rc);
   EXPECT_EQ(std::nullopt, outcome.message);
-  EXPECT_EQ("DOMAINNAME=d\nDNSSUFFIXES=old \nCONFIG_NAME=home\n", content());
+  EXPECT_EQ("DOMAINNAME=d\nDNSSUFFIXES=a \nCONFIG_NAME=office\n", content());
   expectDoneWithoutExit(outcome);
+}
+
+TEST_F(DNSGeneralSettingDataModification, ATextThatTheBrokerFailsToGiveCountsAsAbsent) {
+  for (const Mode mode : {Mode::SetRc, Mode::RcAndNull}) {
+    broker_.failEach("getCharPtr", mode);
+    const Outcome outcome = modify(kEmpty.with("ConfigurationName", "home"));
+    EXPECT_EQ(CMPI_RC_ERR_FAILED, outcome.rc) << "of the broker";
+    EXPECT_EQ(kFile, content()) << nameOf(mode);
+    EXPECT_THAT(outcome.errors(), ElementsAre(kMissing, kFailed));
+  }
 }
 
 TEST_F(DNSGeneralSettingDataModification, TheStatusOfAPropertyIsNotLookedAt) {

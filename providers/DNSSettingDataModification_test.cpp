@@ -191,6 +191,27 @@ TEST_F(DNSSettingDataModification, PropertiesThatTheBrokerFailsToGiveCountAsAbse
   }
 }
 
+TEST_F(DNSSettingDataModification, ATextThatTheBrokerFailsToGiveLeavesWhatIsStored) {
+  struct Text {
+    const char* property;
+    std::size_t call;  // that reads it
+  };
+  for (const Text& text : {Text{"RequestedHostname", 4}, Text{"DomainName", 5}, Text{"ConfigurationName", 7}}) {
+    for (const Mode mode : {Mode::SetRc, Mode::RcAndNull}) {
+      SCOPED_TRACE(std::string(text.property) + ' ' + nameOf(mode));
+      world_.file("eth0", kFile);
+      broker_.startOver();
+      broker_.failAt(text.call, mode);
+      const Outcome outcome = modify(empty().with(text.property, "new"));
+      EXPECT_EQ("getCharPtr", outcome.calls.at(text.call - 1).name);
+      const bool isName = text.property == std::string_view("ConfigurationName");
+      EXPECT_THAT(valuesInFile(), ElementsAre("oldhost", "old.example.org", "192.0.2.9 ", isName ? "office" : ""));
+      EXPECT_EQ(isName ? CMPI_RC_ERR_FAILED : broker_.missingProperty.rc, outcome.rc) << "the broker's last code";
+      expectDoneWithoutExit(outcome);
+    }
+  }
+}
+
 TEST_F(DNSSettingDataModification, EmptyTextsAreValidAndWritten) {
   const Outcome outcome =
       modify(empty().with("RequestedHostname", "").with("DomainName", "").with("ConfigurationName", ""));

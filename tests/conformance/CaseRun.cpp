@@ -190,6 +190,7 @@ struct Setting {
   Request request;
   std::vector<std::string> shows;
   const ProviderFunctions* provider = nullptr;
+  CMPIValueState lie = CMPI_goodValue;
 };
 
 std::vector<std::string> namesIn(const std::vector<SourceLine>& lines) {
@@ -257,6 +258,7 @@ Observed observe(const Setting& setting, const DueFailure& due) {
   furnish(world, setting.world);
   RecordingBroker broker;
   const std::vector<Failure> failures = furnish(broker, setting.broker);
+  if (setting.lie != CMPI_goodValue) broker.addToAllStates(setting.lie);
   const RequestObjects objects(broker, setting.request);
   const State before = stateOf(world, setting.world);
   logger.clear();
@@ -362,8 +364,9 @@ std::vector<WrittenLine> stepsOf(const CaseFile& file, const Case& one) {
 
 }  // namespace
 
-std::string differenceOf(const CaseFile& file, const Case& one) {
-  const Setting setting = settingOf(file, one);
+std::string differenceOf(const CaseFile& file, const Case& one, CMPIValueState lie) {
+  Setting setting = settingOf(file, one);
+  setting.lie = lie;
   const std::vector<WrittenLine> happens = stepsOf(file, one);
   const Observed observed = observe(setting);
   std::string report = difference(happens, observed.happens, "what happens", one.title);

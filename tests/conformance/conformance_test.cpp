@@ -1,4 +1,5 @@
-// Makes a test of every case in the files of this folder. With ZORVA_CONFORMANCE_RECORD set in the environment a test
+// Makes a test of every case in the files of this folder, and for each file tests of all its cases over brokers whose
+// states lie. With ZORVA_CONFORMANCE_RECORD set in the environment a test
 // also prints what came of its request, in the notation of a case.
 #include <gtest/gtest.h>
 
@@ -38,6 +39,31 @@ class CaseTest : public ::testing::Test {
   const Case& one_;
 };
 
+// All cases of a file over a broker whose states lie.
+class LyingStatesTest : public ::testing::Test {
+ public:
+  LyingStatesTest(std::shared_ptr<const CaseFile> file, CMPIValueState lie) : file_(std::move(file)), lie_(lie) {}
+
+  void TestBody() override {
+    for (const Case& one : file_->cases) {
+      const std::string difference = differenceOf(*file_, one, lie_);
+      EXPECT_TRUE(difference.empty()) << one.title.text << "\n" << difference;
+    }
+  }
+
+ private:
+  std::shared_ptr<const CaseFile> file_;
+  CMPIValueState lie_;
+};
+
+struct Lie {
+  const char* testName;
+  CMPIValueState state;
+};
+constexpr Lie kLies[] = {{"HoldWhereGoodValuesAreMarkedNull", CMPI_nullValue},
+                         {"HoldWhereGoodValuesAreMarkedAsKeys", CMPI_keyValue},
+                         {"HoldWhereGoodValuesAreMarkedBad", CMPI_badValue}};
+
 // Stands for a file that cannot be read.
 class UnreadableTest : public ::testing::Test {
  public:
@@ -72,6 +98,10 @@ void addCases(const std::filesystem::path& path, const Phrases& shared) {
     for (const Case& one : file->cases) {
       ::testing::RegisterTest(suite.c_str(), one.testName().c_str(), nullptr, nullptr, path.c_str(), one.title.number,
                               [file, &one]() -> ::testing::Test* { return new CaseTest(file, one); });
+    }
+    for (const Lie& lie : kLies) {
+      ::testing::RegisterTest(suite.c_str(), lie.testName, nullptr, nullptr, path.c_str(), 1,
+                              [file, lie]() -> ::testing::Test* { return new LyingStatesTest(file, lie.state); });
     }
   } catch (const CaseError& error) {
     addUnreadable(suite, error.what());

@@ -290,7 +290,7 @@ std::nullptr_t Call::giveNull(CMPIStatus* rc, CMPIrc code) const {
   return nullptr;
 }
 
-CMPIData Call::giveData(const Value& value, CMPIStatus* rc) const {
+CMPIData Call::giveData(const Value& value, CMPIStatus* rc, CMPIValueState added) const {
   report(rc, CMPI_RC_OK);
   CMPIData data{};
   data.type = value.type;
@@ -301,6 +301,7 @@ CMPIData Call::giveData(const Value& value, CMPIStatus* rc) const {
     data.value = {};
     data.state = CMPI_nullValue;
   }
+  if (!value.isNull()) data.state = static_cast<CMPIValueState>(data.state | added);
   return data;
 }
 

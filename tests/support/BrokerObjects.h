@@ -129,7 +129,8 @@ struct Call {
   auto giveServed(const ServedClass& served, const Maker& make, CMPIStatus* rc) const -> decltype(make());
   // Gives null with a status, whatever failure was asked for.
   std::nullptr_t giveNull(CMPIStatus* rc, CMPIrc code) const;
-  CMPIData giveData(const Value& value, CMPIStatus* rc) const;
+  // added is added to the state of a value that is not null.
+  CMPIData giveData(const Value& value, CMPIStatus* rc, CMPIValueState added = CMPI_goodValue) const;
   CMPIData giveMissing(const Missing& missing, CMPIStatus* rc) const;
   template <typename Number>
   Number giveNumber(Number number, CMPIStatus* rc) const;

@@ -39,28 +39,20 @@ CMPIStatus release(Face* face) {
 
 // The n-th of named values, and its name in a string of its own.
 CMPIData giveNamed(const Call& call, const std::vector<NamedValue>& values, CMPICount index, const Missing& missing,
-                   CMPIString** name, CMPIStatus* rc, CMPIString* (*makeName)(RecordingBroker*, const std::string&)) {
+                   CMPIString** name, CMPIStatus* rc, CMPIString* (*makeName)(RecordingBroker*, const std::string&),
+                   CMPIValueState added = CMPI_goodValue) {
   if (name != nullptr) *name = nullptr;
   if (index >= values.size()) return call.giveMissing(missing, rc);
   if (name != nullptr && call.hasHandle) *name = makeName(call.broker, values[index].first);
-  return call.giveData(values[index].second, rc);
+  return call.giveData(values[index].second, rc, added);
 }
 
 CMPIString* makeName(RecordingBroker* broker, const std::string& name) { return broker->makeString(name); }
 
 CMPIData giveByName(const Call& call, const std::vector<NamedValue>& values, const char* name, const Missing& missing,
-                    CMPIStatus* rc) {
+                    CMPIStatus* rc, CMPIValueState added = CMPI_goodValue) {
   const Value* value = findValue(values, plain(name));
-  return value == nullptr ? call.giveMissing(missing, rc) : call.giveData(*value, rc);
-}
-
-// Keys go out with the state that the test gave them, and with CMPI_keyValue where the broker marks keys so.
-std::vector<NamedValue> markedKeys(const PathObject* object) {
-  std::vector<NamedValue> keys = object->path.keys;
-  for (NamedValue& key : keys) {
-    key.second.state = static_cast<CMPIValueState>(key.second.state | object->broker->stateOfKeys);
-  }
-  return keys;
+  return value == nullptr ? call.giveMissing(missing, rc) : call.giveData(*value, rc, added);
 }
 
 // --- object paths
@@ -120,13 +112,14 @@ CMPIStatus addKey(CMPIObjectPath* face, const char* name, const CMPIValue* value
 CMPIData getKey(const CMPIObjectPath* face, const char* name, CMPIStatus* rc) {
   const PathObject* path = self(face);
   const Call call(path, "getKey", inQuotesOrNull(name));
-  return giveByName(call, markedKeys(path), name, path->broker->missingKey, rc);
+  return giveByName(call, path->path.keys, name, path->broker->missingKey, rc, path->broker->stateOfKeys);
 }
 
 CMPIData getKeyAt(const CMPIObjectPath* face, CMPICount index, CMPIString** name, CMPIStatus* rc) {
   const PathObject* path = self(face);
   const Call call(path, "getKeyAt", numberText(index));
-  return giveNamed(call, markedKeys(path), index, path->broker->missingKey, name, rc, makeName);
+  return giveNamed(call, path->path.keys, index, path->broker->missingKey, name, rc, makeName,
+                   path->broker->stateOfKeys);
 }
 
 CMPICount getKeyCount(const CMPIObjectPath* face, CMPIStatus* rc) {
@@ -306,7 +299,7 @@ CMPIData getElementAt(const CMPIArray* face, CMPICount index, CMPIStatus* rc) {
   const ArrayObject* array = self(face);
   const Call call(array, "getElementAt", numberText(index));
   if (index >= array->elements.size()) return call.giveMissing({CMPI_RC_ERR_NO_SUCH_PROPERTY, CMPI_badValue}, rc);
-  return call.giveData(array->elements[index], rc);
+  return call.giveData(array->elements[index], rc, array->broker->stateOfElements);
 }
 
 CMPIStatus setElementAt(CMPIArray* face, CMPICount index, const CMPIValue* value, CMPIType type) {
@@ -328,7 +321,7 @@ CMPIData getNext(const CMPIEnumeration* face, CMPIStatus* rc) {
   if (enumeration->next >= enumeration->elements.size()) {
     return call.giveMissing({CMPI_RC_ERR_NOT_FOUND, CMPI_nullValue}, rc);
   }
-  return call.giveData(enumeration->elements[enumeration->next++], rc);
+  return call.giveData(enumeration->elements[enumeration->next++], rc, enumeration->broker->stateOfNexts);
 }
 
 CMPIBoolean hasNext(const CMPIEnumeration* face, CMPIStatus* rc) {
@@ -436,13 +429,14 @@ CMPIStatus addArg(const CMPIArgs* face, const char* name, const CMPIValue* value
 CMPIData getArg(const CMPIArgs* face, const char* name, CMPIStatus* rc) {
   const ArgsObject* args = self(face);
   const Call call(args, "getArg", inQuotesOrNull(name));
-  return giveByName(call, args->arguments, name, args->broker->missingArgument, rc);
+  return giveByName(call, args->arguments, name, args->broker->missingArgument, rc, args->broker->stateOfArguments);
 }
 
 CMPIData getArgAt(const CMPIArgs* face, CMPICount index, CMPIString** name, CMPIStatus* rc) {
   const ArgsObject* args = self(face);
   const Call call(args, "getArgAt", numberText(index));
-  return giveNamed(call, args->arguments, index, args->broker->missingArgument, name, rc, makeName);
+  return giveNamed(call, args->arguments, index, args->broker->missingArgument, name, rc, makeName,
+                   args->broker->stateOfArguments);
 }
 
 CMPICount getArgCount(const CMPIArgs* face, CMPIStatus* rc) {

@@ -267,6 +267,10 @@ Results RecordingBroker::read(const CMPIResult* result) {
   return object == nullptr ? Results() : object->results;
 }
 
+void RecordingBroker::addToAllStates(CMPIValueState state) {
+  stateOfKeys = stateOfNexts = stateOfElements = stateOfArguments = state;
+}
+
 void RecordingBroker::setKeysOfClass(const std::string& className, std::vector<std::string> names) {
   keysOfClass_[className] = std::move(names);
 }

@@ -141,8 +141,15 @@ class RecordingBroker {
   Missing missingKey{CMPI_RC_ERR_NOT_FOUND, CMPI_notFound};
   Missing missingProperty{CMPI_RC_ERR_NO_SUCH_PROPERTY, CMPI_notFound};
   Missing missingArgument{CMPI_RC_ERR_NO_SUCH_PROPERTY, CMPI_notFound};
-  CMPIValueState stateOfKeys = CMPI_goodValue;  // some servers mark a key with CMPI_keyValue
-  bool keepsLines = true;                       // false: calls are counted and not written down, for long runs
+  bool keepsLines = true;  // false: calls are counted and not written down, for long runs
+
+  // What is added to the state of a good value, by the call that gives it. Some servers mark keys with CMPI_keyValue,
+  // others leave CMPI_nullValue there.
+  CMPIValueState stateOfKeys = CMPI_goodValue;
+  CMPIValueState stateOfNexts = CMPI_goodValue;  // of getNext
+  CMPIValueState stateOfElements = CMPI_goodValue;
+  CMPIValueState stateOfArguments = CMPI_goodValue;
+  void addToAllStates(CMPIValueState state);
 
   // Failures: at the n-th call from now on, counted from 1; at the next call of a slot; at each call of it.
   void failAt(std::size_t n, Mode mode);
