@@ -28,14 +28,29 @@ void requireSuccess(const ServerUrl& server, const HttpReply& reply) {
   throw Failure(ExitCode::Failed, who + fieldOf(reply, "CIMError"), "is that a CIM server (CIM-XML over HTTP)?");
 }
 
-/// A failure after the answer had begun is told behind it (DSP0200 6.2).
-void requireNoLateFailure(const ServerUrl& server, const HttpReply& reply) {
+/// A failure after the answer had begun comes after it, in trailers (DSP0200 6.2).
+broker::Status lateStatus(const HttpReply& reply) {
   const std::string_view code = reply.field("CIMStatusCode");
-  if (code.empty() || code == "0") return;
   broker::Status status;
-  std::from_chars(code.data(), code.data() + code.size(), status.rc);
+  if (code.empty() || code == "0") return status;
+  const auto read = std::from_chars(code.data(), code.data() + code.size(), status.rc);
+  if (read.ec != std::errc() || status.rc <= 0) status.rc = 1;  // CIM_ERR_FAILED
   status.message = fieldText(reply.field("CIMStatusCodeDescription"));
-  throw operationFailure("the answer of " + server.shown() + " broke off", status);
+  return status;
+}
+
+/// What came before such a failure: all of it where the server has ended the document, as some do; else nothing.
+CimResponse failedResponse(const ServerUrl& server, const HttpReply& reply, broker::Status status,
+                           const schema::ClassRepository& classes) {
+  CimResponse response;
+  try {
+    response = readResponse(reply.body, classes);
+    if (!response.status.ok()) return response;
+  } catch (const Failure&) {
+    status.message = "the answer of " + server.shown() + " broke off: " + status.message;
+  }
+  response.status = std::move(status);
+  return response;
 }
 
 /// A class by itself, with what it inherits in it, as a repository wants it.
@@ -101,8 +116,8 @@ CimResponse RemoteOperations::ask(std::string_view operation, const std::string&
                   "CIMObject: " + fieldValue(object)},
                  message);
   requireSuccess(server_, reply);
-  requireNoLateFailure(server_, reply);
-  return readResponse(reply.body, *classes_);
+  const broker::Status late = lateStatus(reply);
+  return late.ok() ? readResponse(reply.body, *classes_) : failedResponse(server_, reply, late, *classes_);
 }
 
 broker::Status RemoteOperations::handOut(CimResponse response, const std::string& nameSpace,

@@ -291,14 +291,54 @@ TEST(RemoteFailure, TellsOfAnAnswerThatBreaksOff) {
   Outcome outcome = against("HTTP/1.1 200 OK\r\nContent-Length: 1000\r\n\r\n<CIM>");
   EXPECT_EQ(outcome.exitCode, 1);
   EXPECT_THAT(outcome.err, HasSubstr("no answer from http://127.0.0.1:"));
-  const std::string body = ScriptedServer::cimReply("<IRETURNVALUE/>");
-  const std::string xml = body.substr(body.find("\r\n\r\n") + 4);
-  char size[16];
-  std::snprintf(size, sizeof size, "%zx", xml.size());
-  outcome = against(std::string("HTTP/1.1 200 OK\r\nTransfer-Encoding: chunked\r\nTrailer: CIMStatusCode\r\n\r\n") +
-                    size + "\r\n" + xml + "\r\n0\r\nCIMStatusCode: 1\r\nCIMStatusCodeDescription: it%20fell\r\n\r\n");
+  outcome = against(
+      "HTTP/1.1 200 OK\r\nTransfer-Encoding: chunked\r\nTrailer: CIMStatusCode\r\n\r\n5\r\n<CIM>\r\n0\r\n"
+      "CIMStatusCode: 1\r\nCIMStatusCodeDescription: it%20fell\r\n\r\n");
   EXPECT_EQ(outcome.exitCode, 1);
-  EXPECT_THAT(outcome.err, HasSubstr("broke off: CIM_ERR_FAILED (1): it fell\n"));
+  EXPECT_THAT(outcome.err, AllOf(HasSubstr("CIM_ERR_FAILED (1): the answer of http://127.0.0.1:"),
+                                 HasSubstr(" broke off: it fell\n")));
+}
+
+constexpr const char* kEth0Name =
+    R"(<INSTANCENAME CLASSNAME="ZORVA_DNSProtocolEndPoint"><KEYBINDING NAME="Name"><KEYVALUE>eth0</KEYVALUE>)"
+    "</KEYBINDING></INSTANCENAME>";
+
+TEST(RemoteTrailers, TheCimErrorAfterACompleteAnswerIsShownAndSoIsWhatCameBefore) {
+  const Outcome outcome = against(ScriptedServer::failedReply(
+      std::string("<IRETURNVALUE>") + kEth0Name + "</IRETURNVALUE>", "6", "it%20is%20gone"));
+  EXPECT_EQ(outcome.exitCode, 1);
+  EXPECT_EQ(outcome.out, "ZORVA_DNSProtocolEndPoint.Name=\"eth0\"\n");
+  EXPECT_THAT(outcome.err, HasSubstr("ZORVA_DNSSettingData: CIM_ERR_NOT_FOUND (6): it is gone\n"));
+}
+
+TEST(RemoteTrailers, ACodeThatIsNoneIsAFailureAllTheSame) {
+  for (const char* code : {"x", "-1", "99999999999"}) {
+    const Outcome outcome = against(ScriptedServer::failedReply("<IRETURNVALUE/>", code, "odd"));
+    EXPECT_EQ(outcome.exitCode, 1);
+    EXPECT_THAT(outcome.err, HasSubstr("CIM_ERR_FAILED (1): odd")) << code;
+  }
+}
+
+TEST(RemoteTrailers, AGraphGoesOnAfterThem) {
+  const auto has = [](const std::string& request, const char* text) { return request.find(text) != std::string::npos; };
+  const ScriptedServer server([&](const std::string& request) -> std::optional<std::string> {
+    const bool isEndpoint = has(request, "ZORVA_DNSProtocolEndPoint");
+    if (has(request, "\r\nCIMMethod: EnumerateInstanceNames\r\n")) {
+      return isEndpoint ? ScriptedServer::cimReply(std::string("<IRETURNVALUE>") + kEth0Name + "</IRETURNVALUE>")
+                        : ScriptedServer::failedReply("<IRETURNVALUE/>", "7", "not%20here");
+    }
+    if (has(request, "\r\nCIMMethod: GetInstance\r\n")) {
+      return ScriptedServer::cimReply(
+          R"(<IRETURNVALUE><INSTANCE CLASSNAME="ZORVA_DNSProtocolEndPoint"></INSTANCE></IRETURNVALUE>)");
+    }
+    return ScriptedServer::failedReply("<IRETURNVALUE/>", "1", "the%20provider%20fell");
+  });
+  const Outcome outcome = TestHost().run({"graph", "--url", server.url()});
+  EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
+  EXPECT_THAT(outcome.out, AllOf(StartsWith("ZORVA_DNSProtocolEndPoint.Name=\"eth0\"\n"), HasSubstr("1 object")));
+  EXPECT_THAT(outcome.err, AllOf(HasSubstr("ZORVA_DNSSettingData"), HasSubstr("CIM_ERR_NOT_SUPPORTED (7): not here\n"),
+                                 HasSubstr("associations of ZORVA_DNSProtocolEndPoint eth0: CIM_ERR_FAILED (1): the "
+                                           "provider fell\n")));
 }
 
 TEST(RemoteFailure, ShowsNoControlCharacterOfAServer) {

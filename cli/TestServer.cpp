@@ -10,6 +10,7 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <cstdio>
 #include <stdexcept>
 
 #include "cli/TestHost.h"
@@ -85,14 +86,18 @@ TestServer::~TestServer() {
 }
 
 ScriptedServer::ScriptedServer(std::vector<std::string> replies)
-    : listener_(::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0)) {
+    : ScriptedServer([all = std::move(replies), next = std::size_t{0}](const std::string&) mutable {
+        return next < all.size() ? std::optional(all[next++]) : std::nullopt;
+      }) {}
+
+ScriptedServer::ScriptedServer(Answer answer) : listener_(::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0)) {
   sockaddr_in address{};
   address.sin_family = AF_INET;
   address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
   if (::bind(listener_, reinterpret_cast<sockaddr*>(&address), sizeof address) != 0 || ::listen(listener_, 8) != 0) {
     throw std::runtime_error("no port");
   }
-  thread_ = std::thread([this, all = std::move(replies)]() mutable { serve(std::move(all)); });
+  thread_ = std::thread([this, answers = std::move(answer)] { serve(answers); });
 }
 
 ScriptedServer::~ScriptedServer() {
@@ -113,17 +118,19 @@ std::vector<std::string> ScriptedServer::requests() const {
   return requests_;
 }
 
-void ScriptedServer::serve(std::vector<std::string> replies) {
-  for (const std::string& each : replies) {
+void ScriptedServer::serve(const Answer& answer) {
+  for (;;) {
     const int connection = ::accept4(listener_, nullptr, nullptr, SOCK_CLOEXEC);
     if (connection < 0) return;
-    std::string request = readRequest(connection);
-    {
+    const std::string request = readRequest(connection);
+    const std::optional<std::string> reply = answer(request);
+    if (reply) {
       const std::lock_guard<std::mutex> lock(mutex_);
-      requests_.push_back(std::move(request));
+      requests_.push_back(request);
     }
-    sendAll(connection, each);
+    if (reply) sendAll(connection, *reply);
     ::close(connection);
+    if (!reply) break;
   }
   ::shutdown(listener_, SHUT_RDWR);
 }
@@ -133,10 +140,26 @@ std::string ScriptedServer::reply(const std::string& body, const std::string& st
          fields + "\r\n" + body;
 }
 
-std::string ScriptedServer::cimReply(const std::string& content) {
-  return reply(R"(<?xml version="1.0"?><CIM CIMVERSION="2.0" DTDVERSION="2.0"><MESSAGE ID="1" PROTOCOLVERSION="1.0">)"
-               R"(<SIMPLERSP><IMETHODRESPONSE NAME="X">)" +
-               content + "</IMETHODRESPONSE></SIMPLERSP></MESSAGE></CIM>");
+namespace {
+
+std::string cimDocument(const std::string& content) {
+  return R"(<?xml version="1.0"?><CIM CIMVERSION="2.0" DTDVERSION="2.0"><MESSAGE ID="1" PROTOCOLVERSION="1.0">)"
+         R"(<SIMPLERSP><IMETHODRESPONSE NAME="X">)" +
+         content + "</IMETHODRESPONSE></SIMPLERSP></MESSAGE></CIM>";
+}
+
+}  // namespace
+
+std::string ScriptedServer::cimReply(const std::string& content) { return reply(cimDocument(content)); }
+
+std::string ScriptedServer::failedReply(const std::string& content, const std::string& code,
+                                        const std::string& description) {
+  const std::string document = cimDocument(content);
+  char size[20];
+  std::snprintf(size, sizeof size, "%zx", document.size());
+  return std::string("HTTP/1.1 200 OK\r\nTransfer-Encoding: chunked\r\nTrailer: CIMStatusCode\r\n") +
+         "Connection: close\r\n\r\n" + size + "\r\n" + document + "\r\n0\r\nCIMStatusCode: " + code +
+         "\r\nCIMStatusCodeDescription: " + description + "\r\n\r\n";
 }
 
 }  // namespace zorva::cli

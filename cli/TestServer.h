@@ -2,7 +2,9 @@
 
 #include <sys/types.h>
 
+#include <functional>
 #include <mutex>
+#include <optional>
 #include <string>
 #include <thread>
 #include <vector>
@@ -29,10 +31,14 @@ class TestServer {
   std::string url_;
 };
 
-/// A server that gives these replies, whole texts of HTTP, one to each request, whatever that says; behind the last of
-/// them none. Each connection takes one request.
+/// A server that says what a test wants. Each connection takes one request.
 class ScriptedServer {
  public:
+  /// Gives the whole text of the HTTP reply to a request; nothing: there are no more.
+  using Answer = std::function<std::optional<std::string>(const std::string& request)>;
+  explicit ScriptedServer(Answer answer);
+
+  /// These replies, one to each request, whatever that says; none after the last of them.
   explicit ScriptedServer(std::vector<std::string> replies);
   ~ScriptedServer();
   ScriptedServer(const ScriptedServer&) = delete;
@@ -50,8 +56,12 @@ class ScriptedServer {
   /// A reply with a CIM-XML response in it: what stands in an IMETHODRESPONSE.
   static std::string cimReply(const std::string& content);
 
+  /// The same as some servers give it that fail after they have begun: a complete document in chunks, and the failure
+  /// in the trailers after it.
+  static std::string failedReply(const std::string& content, const std::string& code, const std::string& description);
+
  private:
-  void serve(std::vector<std::string> replies);
+  void serve(const Answer& answer);
 
   int listener_;
   std::thread thread_;
