@@ -1,5 +1,6 @@
 #include "broker/Broker.h"
 
+#include <algorithm>
 #include <exception>
 #include <utility>
 
@@ -88,6 +89,13 @@ Shape shapeOf(const Selection& selection) {
 
 FarEnd farEndOf(const AssociationFilter& filter) noexcept {
   return {filter.associationClass, filter.resultClass, filter.role, filter.resultRole};
+}
+
+/// The path of an operation that has a status of its own for a class that is not there (DSP0200 5.3.2.14 to .17, 5.4.1).
+Status makeSource(Arena& arena, const ObjectPath& path, int unknownClass, PathObject*& object) {
+  Status status = makePath(arena, path, true, object);
+  if (status.rc == CMPI_RC_ERR_INVALID_CLASS) status.rc = unknownClass;
+  return status;
 }
 
 /// Opens a request and runs `operation(Request&)` in it. What it throws is want of memory, or comes from a sink.
@@ -182,7 +190,7 @@ Status Broker::associators(const ObjectPath& path, const AssociationFilter& filt
                            const InstanceSink& sink, const Caller& caller) {
   return inRequest(*core_, caller, flagsOf(selection), [&](Request& request) {
     PathObject* name = nullptr;
-    const Status status = makePath(request.arena(), path, true, name);
+    const Status status = makeSource(request.arena(), path, CMPI_RC_ERR_INVALID_PARAMETER, name);
     if (!status.ok()) return status;
     SinkTaker taker(&sink, nullptr);
     return request.associated(*name, Form::Instances, farEndOf(filter), listOnly(selection), taker);
@@ -193,7 +201,7 @@ Status Broker::associatorNames(const ObjectPath& path, const AssociationFilter& 
                                const Caller& caller) {
   return inRequest(*core_, caller, 0, [&](Request& request) {
     PathObject* name = nullptr;
-    const Status status = makePath(request.arena(), path, true, name);
+    const Status status = makeSource(request.arena(), path, CMPI_RC_ERR_INVALID_PARAMETER, name);
     if (!status.ok()) return status;
     SinkTaker taker(nullptr, &sink);
     return request.associated(*name, Form::Paths, farEndOf(filter), Shape(), taker);
@@ -204,7 +212,7 @@ Status Broker::references(const ObjectPath& path, const AssociationFilter& filte
                           const InstanceSink& sink, const Caller& caller) {
   return inRequest(*core_, caller, flagsOf(selection), [&](Request& request) {
     PathObject* name = nullptr;
-    const Status status = makePath(request.arena(), path, true, name);
+    const Status status = makeSource(request.arena(), path, CMPI_RC_ERR_INVALID_PARAMETER, name);
     if (!status.ok()) return status;
     SinkTaker taker(&sink, nullptr);
     return request.referring(*name, Form::Instances, farEndOf(filter), listOnly(selection), taker);
@@ -215,7 +223,7 @@ Status Broker::referenceNames(const ObjectPath& path, const AssociationFilter& f
                               const Caller& caller) {
   return inRequest(*core_, caller, 0, [&](Request& request) {
     PathObject* name = nullptr;
-    const Status status = makePath(request.arena(), path, true, name);
+    const Status status = makeSource(request.arena(), path, CMPI_RC_ERR_INVALID_PARAMETER, name);
     if (!status.ok()) return status;
     SinkTaker taker(nullptr, &sink);
     return request.referring(*name, Form::Paths, farEndOf(filter), Shape(), taker);
@@ -224,22 +232,48 @@ Status Broker::referenceNames(const ObjectPath& path, const AssociationFilter& f
 
 namespace {
 
+bool isInput(const schema::Parameter& parameter) {
+  return schema::findQualifier(parameter.qualifiers, "In") == nullptr ||
+         schema::hasQualifier(parameter.qualifiers, "In");
+}
+
+/// A method of instances is not called on a class, and no required parameter is left out (DSP0200 5.4.1).
+Status checkCall(const ObjectPath& path, const PathObject& name, const schema::ClassMethod& method,
+                 const std::vector<NamedValue>& input) {
+  const std::string& className = name.info->name();
+  if (path.keys.empty() && !name.info->keys().empty() && !schema::hasQualifier(method.qualifiers, "Static")) {
+    return {CMPI_RC_ERR_INVALID_PARAMETER,
+            method.name + " is a method of the instances of " + className + "; the class itself does not have it"};
+  }
+  for (const schema::Parameter& parameter : method.parameters) {
+    if (!isInput(parameter) || !schema::hasQualifier(parameter.qualifiers, "Required")) continue;
+    const bool isGiven = std::any_of(input.begin(), input.end(), [&parameter](const NamedValue& argument) {
+      return schema::sameName(argument.name, parameter.name) && !argument.value.isNull;
+    });
+    if (!isGiven) {
+      return {CMPI_RC_ERR_INVALID_PARAMETER, method.name + ": the parameter " + parameter.name + " is missing"};
+    }
+  }
+  return {};
+}
+
 /// The input of a method as data of the declared types.
-Status makeArguments(Arena& arena, const PathObject& path, std::string_view method,
-                     const std::vector<NamedValue>& input, EntryList& arguments) {
-  const schema::ClassMethod* declared = path.info->declared().findMethod(method);
-  if (declared == nullptr) return {};  // the request itself says so
+Status makeArguments(Arena& arena, const schema::ClassMethod& method, const std::vector<NamedValue>& input,
+                     EntryList& arguments) {
   for (const NamedValue& argument : input) {
-    for (const schema::Parameter& parameter : declared->parameters) {
+    if (arguments.find(argument.name) != nullptr) {
+      return {CMPI_RC_ERR_INVALID_PARAMETER, method.name + ": the parameter " + argument.name + " is there twice"};
+    }
+    for (const schema::Parameter& parameter : method.parameters) {
       if (!schema::sameName(parameter.name, argument.name)) continue;
       CMPIData data;
       Status status =
-          makeData(arena, declaredType(parameter), argument.value, declared->name + "." + parameter.name, data);
-      if (!status.ok()) return status;
+          makeData(arena, declaredType(parameter), argument.value, method.name + "." + parameter.name, data);
+      if (!status.ok()) return {CMPI_RC_ERR_INVALID_PARAMETER, std::move(status.message)};
       arguments.set(arena, arena.intern(parameter.name), data);
     }
     if (arguments.find(argument.name) == nullptr) {
-      return {CMPI_RC_ERR_INVALID_PARAMETER, declared->name + " has no parameter " + argument.name};
+      return {CMPI_RC_ERR_INVALID_PARAMETER, method.name + " has no parameter " + argument.name};
     }
   }
   return {};
@@ -251,11 +285,16 @@ Status Broker::invokeMethod(const ObjectPath& path, std::string_view method, con
                             MethodResult& result, const Caller& caller) {
   return inRequest(*core_, caller, 0, [&](Request& request) {
     PathObject* name = nullptr;
-    EntryList arguments;
-    Status status = makePath(request.arena(), path, true, name);
+    Status status = makeSource(request.arena(), path, CMPI_RC_ERR_NOT_FOUND, name);
     if (status.ok()) status = refuseControlCharacters(input);
-    if (status.ok()) status = makeArguments(request.arena(), *name, method, input, arguments);
     if (!status.ok()) return status;
+    EntryList arguments;
+    // Where there is none, the request itself says so.
+    if (const schema::ClassMethod* declared = name->info->declared().findMethod(method)) {
+      status = checkCall(path, *name, *declared, input);
+      if (status.ok()) status = makeArguments(request.arena(), *declared, input, arguments);
+      if (!status.ok()) return status;
+    }
     EntryList output;
     CMPIData value = nullData(CMPI_null);
     status = request.invoke(*name, method, arguments, value, output);

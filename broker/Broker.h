@@ -148,8 +148,8 @@ class Broker {
   Status deleteInstance(const ObjectPath& path, const Caller& caller = {});
 
   /// The objects at the far ends of the associations of `path`. Every concrete served association that fits the filter
-  /// is asked under its own name; what comes back is checked against `resultClass`. A class in the filter that does not
-  /// exist is CIM_ERR_INVALID_PARAMETER. Where several associations are asked, one that answers "not supported" or
+  /// is asked under its own name; what comes back is checked against `resultClass`. A class that does not exist, of
+  /// `path` or in the filter, is CIM_ERR_INVALID_PARAMETER. Where several associations are asked, one that answers "not supported" or
   /// whose library cannot be loaded is passed over (the latter with a line in the log) unless all are so; after any
   /// other failure the rest are still asked, and the first failure is the status.
   Status associators(const ObjectPath& path, const AssociationFilter& filter, const Selection& selection,
@@ -163,7 +163,10 @@ class Broker {
   Status referenceNames(const ObjectPath& path, const AssociationFilter& filter, const PathSink& sink,
                         const Caller& caller = {});
 
-  /// Calls an extrinsic method. Parameters are turned into the types that the schema declares.
+  /// Calls an extrinsic method. Parameters are turned into the types that the schema declares. CIM_ERR_NOT_FOUND where
+  /// the class does not exist. CIM_ERR_INVALID_PARAMETER for a parameter that the method lacks, that does not fit its
+  /// type or is there twice, for a required one that is missing, and for a path without keys, unless the method is
+  /// static.
   Status invokeMethod(const ObjectPath& path, std::string_view method, const std::vector<NamedValue>& input,
                       MethodResult& result, const Caller& caller = {});
 

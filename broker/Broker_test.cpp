@@ -354,6 +354,45 @@ TEST_F(BrokerTest, RefusesMethodsAndParametersThatDoNotExist) {
   EXPECT_EQ(status_.message, "Echo has no parameter Tone");
 }
 
+TEST_F(BrokerTest, RefusesParametersThatDoNotFitOrAreMissing) {
+  MethodResult result;
+  const auto call = [&](std::string_view method, const std::vector<NamedValue>& input) {
+    status_ = broker_->invokeMethod(path("T_Thing.Name=\"a\""), method, input, result);
+    return std::to_string(status_.rc) + " " + status_.message;
+  };
+  EXPECT_EQ(call("Echo", {{"Times", Value::text("many")}}), "4 Echo.Times: \"many\" is no uint16");
+  EXPECT_EQ(call("Echo", {{"Text", Value::unsignedNumber(5)}}), "4 Echo.Text: 5 is no string");
+  EXPECT_EQ(call("Echo", {{"Text", Value::textArray({"a"})}}),
+            "4 Echo.Text: an array where one value is declared");
+  EXPECT_EQ(call("Echo", {{"Text", Value::text("a")}, {"TEXT", Value::text("b")}}),
+            "4 Echo: the parameter TEXT is there twice");
+  EXPECT_EQ(call("Call", {}), "4 Call: the parameter Text is missing");
+  EXPECT_EQ(call("Call", {{"Text", Value::null(schema::Type::String)}}), "4 Call: the parameter Text is missing");
+  EXPECT_EQ(call("Call", {{"text", Value::text("")}}), "0 ");
+}
+
+TEST_F(BrokerTest, AClassHasStaticMethodsAlone) {
+  MethodResult result;
+  EXPECT_EQ(broker_->invokeMethod(path("T_Thing"), "CallAll", {}, result).rc, 0);
+  EXPECT_EQ(broker_->invokeMethod(path("T_Thing.Name=\"a\""), "CallAll", {}, result).rc, 0);
+  const Status status = broker_->invokeMethod(path("T_Thing"), "Echo", {}, result);
+  EXPECT_EQ(status.rc, 4);
+  EXPECT_EQ(status.message, "Echo is a method of the instances of T_Thing; the class itself does not have it");
+}
+
+TEST_F(BrokerTest, AnUnknownClassHasTheStatusOfItsOperation) {
+  MethodResult result;
+  EXPECT_EQ(broker_->invokeMethod(path("T_None.Name=\"a\""), "Echo", {}, result).rc, 6);
+  const ObjectPath none = path("T_None.Name=\"a\"");
+  const auto instance = [](const Instance&) { return true; };
+  const auto name = [](const ObjectPath&) { return true; };
+  EXPECT_EQ(broker_->associators(none, {}, {}, instance).rc, 4);
+  EXPECT_EQ(broker_->associatorNames(none, {}, name).rc, 4);
+  EXPECT_EQ(broker_->references(none, {}, {}, instance).rc, 4);
+  EXPECT_EQ(broker_->referenceNames(none, {}, name).rc, 4);
+  EXPECT_EQ(broker_->enumerateInstanceNames("", "T_None", name).rc, 5);
+}
+
 TEST_F(BrokerTest, AsksEachAssociationThatFitsUnderItsOwnName) {
   EXPECT_THAT(associatorNames("T_Thing.Name=\"a\""), ElementsAre("root/cimv2:T_Other.Name=\"o\""));
   // The refusing one and the one without a library are passed over.

@@ -22,6 +22,8 @@ Qualifier MaxLen : uint32 = null, Scope(property, method, parameter);
 Qualifier Values : string[], Scope(property, method, parameter), Flavor(EnableOverride, ToSubclass, Translatable);
 Qualifier In : boolean = true, Scope(parameter), Flavor(DisableOverride, ToSubclass);
 Qualifier Out : boolean = false, Scope(parameter), Flavor(DisableOverride, ToSubclass);
+Qualifier Required : boolean = false, Scope(property, reference, method, parameter);
+Qualifier Static : boolean = false, Scope(property, method), Flavor(DisableOverride, ToSubclass);
 
 [Abstract] class T_Base { [Key, MaxLen(64)] string Name; };
 
@@ -35,6 +37,8 @@ Qualifier Out : boolean = false, Scope(parameter), Flavor(DisableOverride, ToSub
   [Write, EmbeddedInstance("T_Thing")] string Inner;
   [Description("Says it again")] uint32 Echo([In, Description("What")] string Text, [In] uint16 Times,
                                              [In(false), Out] string Said, [In] T_Thing REF Target);
+  uint32 Call([Required, In] string Text, [Required, In(false), Out] string Said);
+  [Static] uint32 CallAll();
 };
 class T_SpecialThing : T_Thing { string Extra; };
 class T_Other : T_Base { string Note; };

@@ -443,12 +443,9 @@ void readIntrinsic(xml_node node, Reading& reading, Call& call) {
   call.name = attribute(reading, node, "NAME");
   call.target.nameSpace = readNamespace(required(node, {"LOCALNAMESPACEPATH"}), reading);
   Count count(reading.limits.parameters, "parameters");
-  UniqueNames names;
   for (const xml_node child : node.children("IPARAMVALUE")) {
     count.add(child, node);
-    const std::string_view name = attribute(reading, child, "NAME");
-    names.add(child, "parameter", name);
-    call.parameters.push_back({std::string(name), readParameterValue(child, reading)});
+    call.parameters.push_back({std::string(attribute(reading, child, "NAME")), readParameterValue(child, reading)});
   }
 }
 
@@ -470,6 +467,12 @@ broker::Value readArgument(xml_node node, Reading& reading) {
   return readValue(value, kind, reading, 0);
 }
 
+/// The type that PARAMTYPE names; nothing where it is left out.
+std::optional<schema::Type> saidType(xml_node node) {
+  if (!node.attribute("PARAMTYPE")) return std::nullopt;
+  return typeOf(node, "PARAMTYPE");
+}
+
 void readExtrinsic(xml_node node, Reading& reading, Call& call) {
   call.isExtrinsic = true;
   call.name = attribute(reading, node, "NAME");
@@ -477,12 +480,10 @@ void readExtrinsic(xml_node node, Reading& reading, Call& call) {
   call.target = readPath(target, reading);
   call.onClass = is(target, "LOCALCLASSPATH");
   Count count(reading.limits.parameters, "parameters");
-  UniqueNames names;
   for (const xml_node child : node.children("PARAMVALUE")) {
     count.add(child, node);
-    const std::string_view name = attribute(reading, child, "NAME");
-    names.add(child, "parameter", name);
-    call.input.push_back({std::string(name), readArgument(child, reading)});
+    call.input.push_back({std::string(attribute(reading, child, "NAME")), readArgument(child, reading)});
+    call.saidTypes.push_back(saidType(child));
   }
 }
 

@@ -78,8 +78,11 @@ struct Call {
   /// key with an empty name is the only key that there is (INSTANCENAME with a bare KEYVALUE).
   broker::ObjectPath target;
   bool onClass = false;
+  // A name may be there twice: the operation refuses it, with a status of its own.
   std::vector<Parameter> parameters;      ///< of an IMETHODCALL
   std::vector<broker::NamedValue> input;  ///< of a METHODCALL
+  /// The types that the client gave the elements of `input`; without one, the class alone says the type.
+  std::vector<std::optional<schema::Type>> saidTypes;
 };
 
 struct CimRequest {

@@ -38,6 +38,23 @@ OperationFunction findOperation(std::string_view name) noexcept {
   return nullptr;
 }
 
+/// A parameter that is there twice, in any case; empty where there is none.
+template <class Parameters>
+std::string_view twice(const Parameters& parameters) {
+  std::vector<std::string_view> names;
+  for (const auto& one : parameters) names.push_back(one.name);
+  std::sort(names.begin(), names.end(), schema::NameLess());
+  const auto found = std::adjacent_find(names.begin(), names.end(), schema::NameEqual());
+  return found != names.end() ? *found : std::string_view();
+}
+
+Status checkParameterNames(const cimxml::Call& call) {
+  const std::string_view name = call.isExtrinsic ? twice(call.input) : twice(call.parameters);
+  if (name.empty()) return {};
+  return {CMPI_RC_ERR_INVALID_PARAMETER,
+          call.name + ": the parameter " + broker::quotedText(name.substr(0, 80)) + " is there twice"};
+}
+
 /// CMPI has codes that CIM lacks.
 Status asCim(Status status) {
   constexpr int kLastOfCim = 29;
@@ -57,7 +74,8 @@ Status carryOut(Operation& operation) {
     return {CMPI_RC_ERR_INVALID_NAMESPACE,
             "there is no namespace " + broker::quotedText(call.target.nameSpace.substr(0, 200))};
   }
-  return asCim(function(operation));
+  Status status = checkParameterNames(call);
+  return asCim(status.ok() ? function(operation) : std::move(status));
 }
 
 void settleValue(const Operation& operation, broker::Value& value) {
@@ -139,9 +157,32 @@ Status settlePath(const Operation& operation, broker::ObjectPath& path) {
   return {};
 }
 
+namespace {
+
+/// Values that come without a type take the declared one; a type that the client names has to be that one.
+Status checkSaidTypes(const Operation& operation) {
+  const cimxml::Call& call = operation.call;
+  const schema::Class* declared = operation.classes().find(call.target.className);
+  const schema::ClassMethod* method = declared != nullptr ? declared->findMethod(call.name) : nullptr;
+  if (method == nullptr) return {};  // which the broker says
+  for (std::size_t i = 0; i < call.input.size(); ++i) {
+    for (const schema::Parameter& parameter : method->parameters) {
+      if (!call.saidTypes[i] || *call.saidTypes[i] == parameter.type) continue;
+      if (!schema::sameName(parameter.name, call.input[i].name)) continue;
+      return {CMPI_RC_ERR_INVALID_PARAMETER, method->name + ": the parameter " + parameter.name + " is a " +
+                                                 std::string(schema::typeName(parameter.type)) + ", but comes as a " +
+                                                 std::string(schema::typeName(*call.saidTypes[i]))};
+    }
+  }
+  return {};
+}
+
+}  // namespace
+
 Status invokeMethod(Operation& operation) {
   broker::ObjectPath path = operation.call.target;
-  Status status = settlePath(operation, path);
+  Status status = checkSaidTypes(operation);
+  if (status.ok()) status = settlePath(operation, path);
   if (!status.ok()) return status;
   std::vector<broker::NamedValue> input = operation.call.input;
   for (broker::NamedValue& argument : input) settleValue(operation, argument.value);

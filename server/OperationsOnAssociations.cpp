@@ -62,28 +62,23 @@ void collect(const Class& association, const Class& source, const Question& ques
   }
 }
 
-Status findClass(const Operation& operation, const std::string& name, std::string_view what, int rc,
-                 const Class*& found) {
+Status findClass(const Operation& operation, const std::string& name, std::string_view what, const Class*& found) {
   if (name.empty()) return {};
   found = operation.classes().find(name);
   if (found != nullptr) return {};
-  return {rc, std::string(what) + "there is no class \"" + name + "\""};
+  return {CMPI_RC_ERR_INVALID_PARAMETER, std::string(what) + ": there is no class \"" + name + "\""};
 }
 
 Status answerOfClass(Operation& operation, const Question& question) {
   const Class* source = nullptr;
   const Class* association = nullptr;
   const Class* resultClass = nullptr;
-  Status status = findClass(operation, question.object.className, "", CMPI_RC_ERR_INVALID_CLASS, source);
+  Status status = findClass(operation, question.object.className, "ObjectName", source);
   if (status.ok()) {
-    status =
-        findClass(operation, question.filter.associationClass,
-                  question.ofReferences ? "ResultClass: " : "AssocClass: ", CMPI_RC_ERR_INVALID_PARAMETER, association);
+    status = findClass(operation, question.filter.associationClass,
+                       question.ofReferences ? "ResultClass" : "AssocClass", association);
   }
-  if (status.ok()) {
-    status =
-        findClass(operation, question.filter.resultClass, "ResultClass: ", CMPI_RC_ERR_INVALID_PARAMETER, resultClass);
-  }
+  if (status.ok()) status = findClass(operation, question.filter.resultClass, "ResultClass", resultClass);
   if (!status.ok()) return status;
   std::vector<const Class*> found;
   for (const Class* candidate : operation.classes().classes()) {

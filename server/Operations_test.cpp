@@ -241,8 +241,22 @@ TEST_F(OperationsTest, AssociationsOfClassesComeFromTheSchema) {
   EXPECT_EQ(count(ask("ReferenceNames", ofThing + text("Role", "Left")), "<CLASSNAME"), 4U);
   EXPECT_EQ(count(ask("References", ofThing + className("ResultClass", "T_ThingAbsent")), "<CLASS "), 1U);
   EXPECT_THAT(errorOf("AssociatorNames", parameter("ObjectName", "<CLASSNAME NAME=\"No\"/>")),
-              HasSubstr("5 there is no"));
+              HasSubstr("4 ObjectName: there is no class"));
   EXPECT_THAT(errorOf("AssociatorNames", ofThing + className("ResultClass", "No")), HasSubstr("4 ResultClass"));
+}
+
+TEST_F(OperationsTest, AssociationsOfAnUnknownClassHaveAWrongParameter) {
+  const std::string none = instanceName("T_None", {{"Name", "a"}});
+  for (const char* operation : {"Associators", "AssociatorNames", "References", "ReferenceNames"}) {
+    EXPECT_THAT(errorOf(operation, parameter("ObjectName", none)), HasSubstr("4 there is no class")) << operation;
+    EXPECT_THAT(errorOf(operation, parameter("ObjectName", "<CLASSNAME NAME=\"T_None\"/>")),
+                HasSubstr("4 ObjectName: there is no class"))
+        << operation;
+  }
+  for (const char* operation : {"OpenAssociatorInstances", "OpenAssociatorInstancePaths", "OpenReferenceInstances",
+                                "OpenReferenceInstancePaths"}) {
+    EXPECT_THAT(errorOf(operation, parameter("InstanceName", none)), HasSubstr("4 there is no class")) << operation;
+  }
 }
 
 // Classes.
@@ -274,7 +288,7 @@ TEST_F(OperationsTest, EnumerateClassesGivesThoseBelow) {
 TEST_F(OperationsTest, QualifierTypesCanBeRead) {
   EXPECT_THAT(ask("GetQualifier", text("QualifierName", "key")),
               HasSubstr("<IRETURNVALUE><QUALIFIER.DECLARATION NAME=\"Key\" TYPE=\"boolean\""));
-  EXPECT_EQ(count(ask("EnumerateQualifiers", ""), "<QUALIFIER.DECLARATION"), 10U);
+  EXPECT_EQ(count(ask("EnumerateQualifiers", ""), "<QUALIFIER.DECLARATION"), 12U);
   EXPECT_THAT(errorOf("GetQualifier", text("QualifierName", "No")), HasSubstr("6 there is no qualifier type"));
 }
 
@@ -294,7 +308,57 @@ TEST_F(OperationsTest, AMethodCallThatIsWrongIsAnError) {
   EXPECT_THAT(invoke("Nope", thing("a"), ""), HasSubstr("<ERROR CODE=\"17\""));
   EXPECT_THAT(invoke("Echo", thing("a"), "<PARAMVALUE NAME=\"X\"/>"), HasSubstr("<ERROR CODE=\"4\""));
   EXPECT_THAT(invoke("Echo", thing("a"), "<PARAMVALUE NAME=\"Times\"><VALUE>x</VALUE></PARAMVALUE>"),
-              HasSubstr("<ERROR CODE=\"13\""));
+              HasSubstr("<ERROR CODE=\"4\""));
+  EXPECT_THAT(invoke("Call", thing("a"), ""), HasSubstr("<ERROR CODE=\"4\" DESCRIPTION=\"Call: the parameter Text"));
+}
+
+TEST_F(OperationsTest, ATypeThatAClientNamesIsTheDeclaredOne) {
+  const auto echo = [&](const std::string& name, const std::string& type, const std::string& value) {
+    return invoke("Echo", thing("a"), "<PARAMVALUE NAME=\"" + name + "\" PARAMTYPE=\"" + type + "\">" + value +
+                                          "</PARAMVALUE>");
+  };
+  const std::string five = "<VALUE>5</VALUE>";
+  EXPECT_THAT(echo("text", "uint32", five),
+              HasSubstr("<ERROR CODE=\"4\" DESCRIPTION=\"Echo: the parameter Text is a string, but comes as a uint32"));
+  EXPECT_THAT(echo("Times", "string", five), HasSubstr("<ERROR CODE=\"4\""));
+  EXPECT_THAT(echo("Times", "uint32", five), HasSubstr("<ERROR CODE=\"4\""));
+  EXPECT_THAT(echo("Target", "string", "<VALUE.REFERENCE>" + thing("a") + "</VALUE.REFERENCE>"),
+              HasSubstr("<ERROR CODE=\"4\""));
+  EXPECT_THAT(echo("Times", "uint16", five), Not(HasSubstr("<ERROR")));
+  EXPECT_THAT(echo("Target", "reference", "<VALUE.REFERENCE>" + thing("a") + "</VALUE.REFERENCE>"),
+              Not(HasSubstr("<ERROR")));
+}
+
+TEST_F(OperationsTest, AMethodOfAClassThatDoesNotExistIsNotFound) {
+  const auto call = [&](const std::string& target, const std::string& method, const std::string& object) {
+    const std::string content = "<SIMPLEREQ><METHODCALL NAME=\"" + method + "\">" + target +
+                                "</METHODCALL></SIMPLEREQ>";
+    return service_
+        .ask(testing::post(testing::message(content),
+                           {{"CIMOperation", "MethodCall"}, {"CIMMethod", method}, {"CIMObject", object}}))
+        .body;
+  };
+  const auto ofClass = [](const std::string& name) {
+    return "<LOCALCLASSPATH>" + testing::localNamespace("root/cimv2") + "<CLASSNAME NAME=\"" + name +
+           "\"/></LOCALCLASSPATH>";
+  };
+  EXPECT_THAT(call("<LOCALINSTANCEPATH>" + testing::localNamespace("root/cimv2") +
+                       instanceName("T_None", {{"Name", "a"}}) + "</LOCALINSTANCEPATH>",
+                   "Echo", "root/cimv2:T_None.Name=\"a\""),
+              HasSubstr("<ERROR CODE=\"6\""));
+  EXPECT_THAT(call(ofClass("T_None"), "Echo", "root/cimv2:T_None"), HasSubstr("<ERROR CODE=\"6\""));
+  EXPECT_THAT(call(ofClass("T_Thing"), "Echo", "root/cimv2:T_Thing"),
+              HasSubstr("<ERROR CODE=\"4\" DESCRIPTION=\"Echo is a method of the instances"));
+  EXPECT_THAT(call(ofClass("T_Thing"), "CallAll", "root/cimv2:T_Thing"), Not(HasSubstr("<ERROR")));
+}
+
+TEST_F(OperationsTest, AParameterThatIsThereTwiceIsAWrongOne) {
+  const std::string name = className("ClassName", "T_Thing");
+  EXPECT_EQ(errorOf("EnumerateInstanceNames", name + className("CLASSNAME", "T_Other")),
+            "4 EnumerateInstanceNames: the parameter &quot;CLASSNAME&quot; is there twice");
+  const std::string text = "<PARAMVALUE NAME=\"Text\"><VALUE>x</VALUE></PARAMVALUE>";
+  EXPECT_THAT(invoke("Echo", thing("a"), text + text),
+              HasSubstr("<ERROR CODE=\"4\" DESCRIPTION=\"Echo: the parameter &quot;Text&quot; is there twice"));
 }
 
 // What goes wrong.
