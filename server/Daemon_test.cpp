@@ -45,6 +45,83 @@ TEST(Daemon, AnswersWithTheInstancesOfTheHost) {
   EXPECT_TRUE(daemon.logs("POST /cimom EnumerateInstanceNames: 200")) << daemon.log();
 }
 
+TEST(Daemon, SaysToABrowserWhatItIsAndHowToAskIt) {
+  const TestDaemon daemon;
+  Wire wire(daemon.port());
+  wire.send("GET / HTTP/1.1\r\nHost: x\r\n\r\n");
+  const WireResponse page = wire.receive();
+  EXPECT_EQ(page.status, 200);
+  EXPECT_THAT(page.body, HasSubstr("This is zorvacimd "));
+  EXPECT_THAT(page.body, HasSubstr("zorvactl --url http://localhost:" + std::to_string(daemon.port()) + "/root/cimv2"));
+}
+
+TEST(Daemon, AnswersMPostWithAnEmptyExt) {
+  const TestDaemon daemon;
+  std::string request = testing::enumeration("EnumerateInstanceNames", "ZORVA_DNSProtocolEndPoint",
+                                             "Man: http://www.dmtf.org/cim/mapping/http/v1.0 ; ns=73\r\n");
+  Wire wire(daemon.port());
+  wire.send("M-" + request);
+  const WireResponse response = wire.receive();
+  EXPECT_EQ(response.status, 200);
+  ASSERT_EQ(response.headers.count("ext"), 1U);
+  EXPECT_EQ(response.headers.at("ext"), "");
+}
+
+/// A message with one call, and what the answer to it holds from the first INSTANCENAME on to its end.
+std::string firstName(int port, const std::string& method, const std::string& object, const std::string& call) {
+  Wire wire(port);
+  wire.send(
+      testing::posting("<?xml version=\"1.0\" encoding=\"utf-8\"?><CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.0\">"
+                       "<MESSAGE ID=\"1\" PROTOCOLVERSION=\"1.0\"><SIMPLEREQ>" +
+                           call + "</SIMPLEREQ></MESSAGE></CIM>",
+                       "CIMOperation: MethodCall\r\nCIMMethod: " + method + "\r\nCIMObject: " + object + "\r\n"));
+  const std::string body = wire.receive().body;
+  EXPECT_EQ(body.find("<INSTANCENAME"), body.rfind("<INSTANCENAME")) << "the host has one endpoint: " << body;
+  const std::size_t begin = body.find("<INSTANCENAME");
+  const std::size_t end = body.find("</INSTANCENAME>");
+  return begin < end && end != std::string::npos ? body.substr(begin, end - begin) : body;
+}
+
+TEST(Daemon, TheCentralInstancesAreThoseThatConformToTheProfile) {
+  const TestDaemon daemon;
+  const std::string id = "ZORVA:DNSClient:1.0.0";
+  const std::string nameSpace = "<LOCALNAMESPACEPATH><NAMESPACE NAME=\"interop\"/></LOCALNAMESPACEPATH>";
+  const std::string profile =
+      "<INSTANCENAME CLASSNAME=\"CIM_RegisteredProfile\"><KEYBINDING NAME=\"InstanceID\">"
+      "<KEYVALUE>" +
+      id + "</KEYVALUE></KEYBINDING></INSTANCENAME>";
+  const std::string byMethod =
+      firstName(daemon.port(), "GetCentralInstances", "interop:CIM_RegisteredProfile.InstanceID=\"" + id + "\"",
+                "<METHODCALL NAME=\"GetCentralInstances\"><LOCALINSTANCEPATH>" + nameSpace + profile +
+                    "</LOCALINSTANCEPATH></METHODCALL>");
+  const std::string byAssociation =
+      firstName(daemon.port(), "AssociatorNames", "interop",
+                "<IMETHODCALL NAME=\"AssociatorNames\">" + nameSpace + "<IPARAMVALUE NAME=\"ObjectName\">" + profile +
+                    "</IPARAMVALUE><IPARAMVALUE NAME=\"AssocClass\"><CLASSNAME NAME=\"CIM_ElementConformsToProfile\"/>"
+                    "</IPARAMVALUE></IMETHODCALL>");
+  EXPECT_THAT(byMethod, StartsWith("<INSTANCENAME CLASSNAME=\"ZORVA_DNSProtocolEndPoint\">"));
+  EXPECT_EQ(byMethod, byAssociation);
+}
+
+TEST(Daemon, LogsAChangeAtTheDefaultLevel) {
+  const TestDaemon daemon("", {"--listen", "127.0.0.1", "--port", "0", "--log-level", "5000"});
+  Wire wire(daemon.port());
+  wire.send(testing::posting(
+      "<?xml version=\"1.0\" encoding=\"utf-8\"?><CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.0\">"
+      "<MESSAGE ID=\"1\" PROTOCOLVERSION=\"1.0\"><SIMPLEREQ><IMETHODCALL NAME=\"SetProperty\"><LOCALNAMESPACEPATH>"
+      "<NAMESPACE NAME=\"root\"/><NAMESPACE NAME=\"cimv2\"/></LOCALNAMESPACEPATH><IPARAMVALUE NAME=\"InstanceName\">"
+      "<INSTANCENAME CLASSNAME=\"ZORVA_DNSProtocolEndPoint\"><KEYBINDING NAME=\"Name\"><KEYVALUE>eth0</KEYVALUE>"
+      "</KEYBINDING></INSTANCENAME></IPARAMVALUE><IPARAMVALUE NAME=\"PropertyName\"><VALUE>DomainName</VALUE>"
+      "</IPARAMVALUE><IPARAMVALUE NAME=\"NewValue\"><VALUE>example.net</VALUE></IPARAMVALUE></IMETHODCALL></SIMPLEREQ>"
+      "</MESSAGE></CIM>",
+      "CIMOperation: MethodCall\r\nCIMMethod: SetProperty\r\nCIMObject: root/cimv2\r\n"));
+  const WireResponse response = wire.receive();
+  EXPECT_THAT(response.body, HasSubstr("<IMETHODRESPONSE NAME=\"SetProperty\"></IMETHODRESPONSE>"));
+  EXPECT_TRUE(daemon.logs(" changed root/cimv2:ZORVA_DNSProtocolEndPoint.")) << daemon.log();
+  EXPECT_THAT(daemon.log(), HasSubstr(" 127.0.0.1:"));
+  EXPECT_THAT(daemon.log(), HasSubstr(": DomainName\n"));
+}
+
 // ---- Hostile requests ----
 
 struct Hostile {

@@ -12,6 +12,7 @@
 #include "cmpift.h"
 #include "cmpimacs.h"
 #include "schema/Names.h"
+#include "schema/Schema.h"
 #include "server/InteropModel.h"
 
 namespace zorva::server {
@@ -22,17 +23,18 @@ using broker::Instance;
 using broker::ObjectPath;
 
 constexpr const char* kPrefix = "Interop";
-constexpr const char* kProfileNameSpace = "root/cimv2";
+constexpr const char* kInterop = "interop";
+constexpr const char* kEndpointNameSpace = "root/cimv2";
 
 constexpr CMPIStatus kOk{CMPI_RC_OK, nullptr};
 
 const CMPIBroker* brokerOf(const void* hdl) noexcept { return static_cast<const CMPIBroker*>(hdl); }
 
-/// The names of a class's instances in the namespace of the profile; none where they cannot be had.
+/// The names of a class's instances in the namespace of the endpoints; none where they cannot be had.
 std::vector<ObjectPath> namesOf(const CMPIBroker* broker, const CMPIContext* context, const char* className) {
   std::vector<ObjectPath> names;
   CMPIStatus status = kOk;
-  const CMPIObjectPath* asked = CMNewObjectPath(broker, kProfileNameSpace, className, &status);
+  const CMPIObjectPath* asked = CMNewObjectPath(broker, kEndpointNameSpace, className, &status);
   CMPIEnumeration* found = asked != nullptr ? CBEnumInstanceNames(broker, context, asked, &status) : nullptr;
   while (found != nullptr && CMHasNext(found, &status)) {
     const CMPIData data = CMGetNext(found, &status);
@@ -47,13 +49,21 @@ std::string hostName() {
   return gethostname(name, sizeof name - 1) == 0 && name[0] != '\0' ? name : "localhost";
 }
 
-InteropWorld worldAt(const CMPIBroker* broker, const CMPIContext* context, const CMPIObjectPath* asked) {
+/// What the instances of a class are made of. A provider is asked only where they need it: they can be had while it
+/// hangs.
+InteropWorld worldAt(const CMPIBroker* broker, const CMPIContext* context, const CMPIObjectPath* asked,
+                     std::string_view className) {
   InteropWorld world;
   world.nameSpace = broker::textOf(CMGetNameSpace(asked, nullptr));
   world.nameSpaces = broker::BrokerCore::of(broker)->registry().nameSpaces();
+  world.profileNameSpace = schema::sameNamespace(world.nameSpace, kEndpointNameSpace) ? kInterop : world.nameSpace;
   world.hostName = hostName();
-  world.systems = namesOf(broker, context, "CIM_ComputerSystem");
-  world.endpoints = namesOf(broker, context, "CIM_DNSProtocolEndpoint");
+  if (schema::sameName(className, kProfileClass)) return world;
+  if (schema::sameName(className, kConformanceClass)) {
+    world.endpoints = namesOf(broker, context, "CIM_DNSProtocolEndpoint");
+  } else {
+    world.systems = namesOf(broker, context, "CIM_ComputerSystem");
+  }
   return world;
 }
 
@@ -90,8 +100,9 @@ CMPIStatus cleanUpInstances(CMPIInstanceMI* mi, const CMPIContext*, CMPIBoolean)
 
 CMPIStatus enumerateNames(CMPIInstanceMI* mi, const CMPIContext* context, const CMPIResult* result,
                           const CMPIObjectPath* asked) {
-  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked);
-  for (const Instance& one : interopInstances(world, valueOf(asked).className)) {
+  const std::string className = valueOf(asked).className;
+  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked, className);
+  for (const Instance& one : interopInstances(world, className)) {
     CMReturnObjectPath(result, objectOf(one.path));
   }
   CMReturnDone(result);
@@ -100,8 +111,9 @@ CMPIStatus enumerateNames(CMPIInstanceMI* mi, const CMPIContext* context, const 
 
 CMPIStatus enumerateInstances(CMPIInstanceMI* mi, const CMPIContext* context, const CMPIResult* result,
                               const CMPIObjectPath* asked, const char**) {
-  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked);
-  for (const Instance& one : interopInstances(world, valueOf(asked).className)) {
+  const std::string className = valueOf(asked).className;
+  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked, className);
+  for (const Instance& one : interopInstances(world, className)) {
     CMReturnInstance(result, objectOf(one));
   }
   CMReturnDone(result);
@@ -110,8 +122,8 @@ CMPIStatus enumerateInstances(CMPIInstanceMI* mi, const CMPIContext* context, co
 
 CMPIStatus getInstance(CMPIInstanceMI* mi, const CMPIContext* context, const CMPIResult* result,
                        const CMPIObjectPath* asked, const char**) {
-  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked);
   const ObjectPath path = valueOf(asked);
+  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked, path.className);
   for (const Instance& one : interopInstances(world, path.className)) {
     if (sameInstance(one.path, path)) CMReturnInstance(result, objectOf(one));
   }
@@ -168,7 +180,7 @@ CMPIStatus associators(CMPIAssociationMI* mi, const CMPIContext* context, const 
                        const CMPIObjectPath* asked, const char* association, const char*, const char* role,
                        const char* resultRole, const char**) {
   const CMPIBroker* broker = brokerOf(mi->hdl);
-  const InteropWorld world = worldAt(broker, context, asked);
+  const InteropWorld world = worldAt(broker, context, asked, association);
   walk(world, valueOf(asked), association, role, resultRole, [&](const Instance&, const ObjectPath& farEnd) {
     CMPIStatus status = kOk;
     const CMPIInstance* found = CBGetInstance(broker, context, objectOf(farEnd), nullptr, &status);
@@ -181,7 +193,7 @@ CMPIStatus associators(CMPIAssociationMI* mi, const CMPIContext* context, const 
 CMPIStatus associatorNames(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
                            const CMPIObjectPath* asked, const char* association, const char*, const char* role,
                            const char* resultRole) {
-  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked);
+  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked, association);
   walk(world, valueOf(asked), association, role, resultRole,
        [&](const Instance&, const ObjectPath& farEnd) { CMReturnObjectPath(result, objectOf(farEnd)); });
   CMReturnDone(result);
@@ -190,7 +202,7 @@ CMPIStatus associatorNames(CMPIAssociationMI* mi, const CMPIContext* context, co
 
 CMPIStatus references(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
                       const CMPIObjectPath* asked, const char* association, const char* role, const char**) {
-  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked);
+  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked, association);
   walk(world, valueOf(asked), association, role, nullptr,
        [&](const Instance& one, const ObjectPath&) { CMReturnInstance(result, objectOf(one)); });
   CMReturnDone(result);
@@ -199,7 +211,7 @@ CMPIStatus references(CMPIAssociationMI* mi, const CMPIContext* context, const C
 
 CMPIStatus referenceNames(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
                           const CMPIObjectPath* asked, const char* association, const char* role) {
-  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked);
+  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked, association);
   walk(world, valueOf(asked), association, role, nullptr,
        [&](const Instance& one, const ObjectPath&) { CMReturnObjectPath(result, objectOf(one.path)); });
   CMReturnDone(result);
@@ -217,15 +229,15 @@ CMPIStatus cleanUpMethods(CMPIMethodMI* mi, const CMPIContext*, CMPIBoolean) {
   return kOk;
 }
 
-/// The central class of the DNS Client profile is the endpoint (DSP1038).
+/// The central class of the profile is the endpoint.
 CMPIStatus invoke(CMPIMethodMI* mi, const CMPIContext* context, const CMPIResult* result, const CMPIObjectPath* asked,
                   const char* method, const CMPIArgs*, CMPIArgs* output) {
   if (!schema::sameName(method, "GetCentralInstances")) {
     return {CMPI_RC_ERR_METHOD_NOT_AVAILABLE, nullptr};
   }
   const CMPIBroker* broker = brokerOf(mi->hdl);
-  const InteropWorld world = worldAt(broker, context, asked);
-  const std::vector<Instance> profiles = interopInstances(world, "CIM_RegisteredProfile");
+  const InteropWorld world = worldAt(broker, context, asked, kConformanceClass);
+  const std::vector<Instance> profiles = interopInstances(world, kProfileClass);
   if (!sameInstance(profiles.front().path, valueOf(asked))) return {CMPI_RC_ERR_NOT_FOUND, nullptr};
   CMPIStatus status = kOk;
   const auto count = static_cast<CMPICount>(world.endpoints.size());
@@ -269,12 +281,14 @@ void serveInterop(broker::BrokerOptions& options) {
       {"CIM_CIMXMLCommunicationMechanism", broker::InstanceMi},
       {"CIM_Namespace", broker::InstanceMi},
       {"CIM_NamespaceInManager", broker::InstanceMi | broker::AssociationMi},
-      {"CIM_RegisteredProfile", broker::InstanceMi | broker::MethodMi},
-      {"CIM_ElementConformsToProfile", broker::InstanceMi | broker::AssociationMi},
+      {kProfileClass, broker::InstanceMi | broker::MethodMi},
+      {kConformanceClass, broker::InstanceMi | broker::AssociationMi},
   };
-  for (const char* nameSpace : {"interop", "root/interop"}) {
+  for (const char* nameSpace : {kInterop, "root/interop"}) {
     for (const Row& row : kClasses) options.registry.add({row.className, kPrefix, "", row.kinds, nameSpace});
   }
+  options.registry.add(
+      {kConformanceClass, kPrefix, "", broker::InstanceMi | broker::AssociationMi, kEndpointNameSpace});
   options.linked.push_back(linked("InstanceMI", createMi<CMPIInstanceMI, CMPIInstanceMIFT, &instanceTable>));
   options.linked.push_back(
       linked("AssociationMI", createMi<CMPIAssociationMI, CMPIAssociationMIFT, &associationTable>));

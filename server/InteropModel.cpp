@@ -99,25 +99,29 @@ Instance nameSpaceInstance(const InteropWorld& world, const std::string& name) {
 }
 
 Instance profile(const InteropWorld& world) {
-  return make(world, "CIM_RegisteredProfile", {{"InstanceID", text("ZORVA:DSP1038:1.0.2")}},
-              {{"ElementName", text("DNS Client")},
-               {"Description", text("DMTF DSP1038, DNS Client Profile")},
-               {"SpecificationType", number(2, Type::Uint16)},
-               {"RegisteredOrganization", number(2, Type::Uint16)},
-               {"RegisteredName", text("DNS Client")},
-               {"RegisteredVersion", text("1.0.2")},
-               {"AdvertiseTypes", numbers({2})}});
+  Instance instance =
+      make(world, kProfileClass, {{"InstanceID", text("ZORVA:DNSClient:1.0.0")}},
+           {{"ElementName", text("Zorva DNS Client")},
+            {"Description", text("The DNS client configuration of a host, as the classes ZORVA_DNS* publish it")},
+            {"SpecificationType", number(2, Type::Uint16)},
+            // Other: conformance to a profile of another publisher is not claimed.
+            {"RegisteredOrganization", number(1, Type::Uint16)},
+            {"OtherRegisteredOrganization", text("Zorva")},
+            {"RegisteredName", text("Zorva DNS Client")},
+            {"RegisteredVersion", text("1.0.0")},
+            {"AdvertiseTypes", numbers({2})}});
+  instance.path.nameSpace = world.profileNameSpace;
+  return instance;
 }
 
+/// Of the central instances alone: what a client finds by the association is what GetCentralInstances gives.
 std::vector<Instance> conformances(const InteropWorld& world) {
   std::vector<Instance> all;
-  for (const auto* elements : {&world.endpoints, &world.systems}) {
-    for (const ObjectPath& element : *elements) {
-      all.push_back(make(world, "CIM_ElementConformsToProfile",
-                         {{"ConformantStandard", Value::reference(profile(world).path)},
-                          {"ManagedElement", Value::reference(element)}},
-                         {}));
-    }
+  for (const ObjectPath& endpoint : world.endpoints) {
+    all.push_back(make(
+        world, kConformanceClass,
+        {{"ConformantStandard", Value::reference(profile(world).path)}, {"ManagedElement", Value::reference(endpoint)}},
+        {}));
   }
   return all;
 }
@@ -146,8 +150,8 @@ std::vector<Instance> interopInstances(const InteropWorld& world, std::string_vi
   const auto is = [className](std::string_view name) { return schema::sameName(className, name); };
   if (is(kManagerClass)) return {manager(world)};
   if (is("CIM_CIMXMLCommunicationMechanism")) return {communication(world)};
-  if (is("CIM_RegisteredProfile")) return {profile(world)};
-  if (is("CIM_ElementConformsToProfile")) return conformances(world);
+  if (is(kProfileClass)) return {profile(world)};
+  if (is(kConformanceClass)) return conformances(world);
   if (is("CIM_NamespaceInManager")) return namespaceLinks(world);
   std::vector<Instance> all;
   if (is("CIM_Namespace")) {

@@ -10,9 +10,13 @@
 
 namespace zorva::server {
 
+inline constexpr const char* kProfileClass = "CIM_RegisteredProfile";
+inline constexpr const char* kConformanceClass = "CIM_ElementConformsToProfile";
+
 /// What the instances tell of.
 struct InteropWorld {
   std::string nameSpace;                ///< in which they are asked for
+  std::string profileNameSpace;         ///< in which the profile is registered
   std::vector<std::string> nameSpaces;  ///< all that the server has
   std::string hostName;
   std::vector<broker::ObjectPath> systems;    ///< the computer systems

@@ -10,7 +10,6 @@
 namespace zorva::server {
 namespace {
 
-using ::testing::Contains;
 using ::testing::ElementsAre;
 using ::testing::HasSubstr;
 using ::testing::SizeIs;
@@ -18,6 +17,7 @@ using ::testing::SizeIs;
 InteropWorld world() {
   InteropWorld known;
   known.nameSpace = "interop";
+  known.profileNameSpace = "interop";
   known.nameSpaces = {"root/cimv2", "interop"};
   known.hostName = "h";
   known.systems = {{"", "root/cimv2", "ZORVA_ComputerSystem", {{"Name", broker::Value::text("s")}}}};
@@ -40,9 +40,21 @@ TEST(InteropModel, HasAnInstanceForEachNamespace) {
 
 TEST(InteropModel, LinksTheProfileToWhatConformsToIt) {
   const auto links = interopInstances(world(), "CIM_ElementConformsToProfile");
-  ASSERT_EQ(links.size(), 3U);
-  EXPECT_THAT(namesOf(links), Contains(HasSubstr("eth1")));
-  EXPECT_THAT(namesOf(links), Contains(HasSubstr("ZORVA_ComputerSystem")));
+  EXPECT_THAT(namesOf(links), ElementsAre(HasSubstr("eth0"), HasSubstr("eth1")));
+}
+
+TEST(InteropModel, TheProfileIsInTheNamespaceOfItsRegistration) {
+  InteropWorld elsewhere = world();
+  elsewhere.nameSpace = "root/cimv2";
+  EXPECT_THAT(
+      namesOf(interopInstances(elsewhere, "CIM_ElementConformsToProfile")),
+      ElementsAre(HasSubstr("\"interop:CIM_RegisteredProfile."), HasSubstr("\"interop:CIM_RegisteredProfile.")));
+}
+
+TEST(InteropModel, TheProfileIsOfTheProjectsOwn) {
+  const broker::Instance profile = interopInstances(world(), "CIM_RegisteredProfile").at(0);
+  EXPECT_EQ(*profile.property("RegisteredOrganization"), broker::Value::unsignedNumber(1, schema::Type::Uint16));
+  EXPECT_EQ(profile.property("OtherRegisteredOrganization")->asText(), "Zorva");
 }
 
 TEST(InteropModel, NamesTheHostWhereNoProviderTellsOfASystem) {
@@ -83,7 +95,7 @@ class InteropTest : public ::testing::Test {
     return found;
   }
 
-  static broker::ObjectPath profile(const std::string& id = "ZORVA:DSP1038:1.0.2") {
+  static broker::ObjectPath profile(const std::string& id = "ZORVA:DNSClient:1.0.0") {
     return {"", "interop", "CIM_RegisteredProfile", {{"InstanceID", broker::Value::text(id)}}};
   }
 
@@ -97,6 +109,8 @@ TEST_F(InteropTest, IsServedInBothNamespacesAndInNoOther) {
   EXPECT_THAT(names("interop", "CIM_RegisteredSpecification"), SizeIs(1));
   names("root/cimv2", "CIM_Namespace");
   EXPECT_EQ(status_.rc, 7);
+  names("root/cimv2", "CIM_ElementConformsToProfile");
+  EXPECT_EQ(status_.rc, 0) << "but from an endpoint there is a way to its profile";
 }
 
 TEST_F(InteropTest, SetsNothingThatTheSchemaLacks) {
@@ -117,7 +131,7 @@ TEST_F(InteropTest, SetsNothingThatTheSchemaLacks) {
 TEST_F(InteropTest, GetsTheProfileByItsName) {
   broker::Instance instance;
   EXPECT_TRUE(broker_->getInstance(profile(), {}, instance).ok());
-  EXPECT_EQ(instance.property("RegisteredName")->asText(), "DNS Client");
+  EXPECT_EQ(instance.property("RegisteredName")->asText(), "Zorva DNS Client");
   EXPECT_EQ(broker_->getInstance(profile("another"), {}, instance).rc, 6);
   EXPECT_EQ(broker_->deleteInstance(profile()).rc, 7);
 }

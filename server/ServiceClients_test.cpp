@@ -102,7 +102,7 @@ class Server {
 constexpr const char* kEndpoint =
     "root/cimv2:ZORVA_DNSProtocolEndPoint.SystemCreationClassName=\"ZORVA_ComputerSystem\","
     "CreationClassName=\"ZORVA_DNSProtocolEndPoint\",SystemName=\"host1\",Name=\"eth0\"";
-constexpr const char* kProfile = "interop:CIM_RegisteredProfile.InstanceID=\"ZORVA:DSP1038:1.0.2\"";
+constexpr const char* kProfile = "interop:CIM_RegisteredProfile.InstanceID=\"ZORVA:DNSClient:1.0.0\"";
 
 class Wbemcli : public ::testing::Test {
  protected:
@@ -183,16 +183,20 @@ TEST_F(Wbemcli, FindsOutWhatIsHere) {
         AllOf(HasSubstr("Name=\"root/cimv2\""), HasSubstr("Name=\"interop\""), HasSubstr("Name=\"root/interop\"")));
     EXPECT_THAT(ask("ei", nameSpace + ":CIM_ObjectManager"), HasSubstr("ElementName=\"zorvacimd\""));
     EXPECT_THAT(ask("ei", nameSpace + ":CIM_RegisteredProfile"),
-                AllOf(HasSubstr("RegisteredName=\"DNS Client\""), HasSubstr("RegisteredOrganization=2")));
+                AllOf(HasSubstr("RegisteredName=\"Zorva DNS Client\""), HasSubstr("RegisteredOrganization=1")));
   }
-  EXPECT_THAT(ask("ain", kProfile, {}, {"-ac", "CIM_ElementConformsToProfile"}),
-              AllOf(HasSubstr("root/cimv2:ZORVA_DNSProtocolEndPoint."), HasSubstr("root/cimv2:ZORVA_ComputerSystem.")));
+  const std::string conformant = ask("ain", kProfile, {}, {"-ac", "CIM_ElementConformsToProfile"});
+  EXPECT_THAT(conformant, AllOf(HasSubstr("root/cimv2:ZORVA_DNSProtocolEndPoint."), Not(HasSubstr("ComputerSystem."))));
+  EXPECT_THAT(ask("ain", kEndpoint, {}, {"-ac", "CIM_ElementConformsToProfile"}),
+              HasSubstr("interop:CIM_RegisteredProfile.InstanceID="));
+  EXPECT_THAT(ask("ai", kEndpoint, {}, {"-arc", "CIM_RegisteredProfile"}),
+              HasSubstr("RegisteredName=\"Zorva DNS Client\""));
   EXPECT_THAT(ask("ai", kProfile), HasSubstr("Hostname=\"host1\""));
   EXPECT_THAT(ask("rin", kProfile), HasSubstr("CIM_ElementConformsToProfile."));
   EXPECT_THAT(ask("ri", kProfile), HasSubstr("CIM_ElementConformsToProfile."));
   std::string endpoint = kEndpoint;
   endpoint.replace(0, std::string("root/cimv2").size(), "interop");
-  EXPECT_THAT(ask("ain", endpoint), HasSubstr("CIM_RegisteredProfile.InstanceID=\"ZORVA:DSP1038:1.0.2\""));
+  EXPECT_THAT(ask("ain", endpoint), HasSubstr("CIM_RegisteredProfile.InstanceID=\"ZORVA:DNSClient:1.0.0\""));
 }
 
 TEST_F(Wbemcli, IsToldWhatIsWrong) {
