@@ -29,7 +29,8 @@ void addOptions(CLI::App& app, CommandLine& line) {
       ->type_name("N")
       ->check(CLI::Range(0, 65535));
   app.add_option("--log-level", line.logLevel,
-                 "Log lines from this level on: 4500 each request, 5000 what was refused (the default), 6000 errors")
+                 "Log lines from this level on: 4500 each request, 5000 changes and what was refused (the default), "
+                 "6000 errors")
       ->type_name("N");
   app.add_option("--agent-config", line.agentConfig,
                  "The agent's configuration (default: $ZORVAGENT_CONFIG, else /etc/zorvagent/agent.toml)")

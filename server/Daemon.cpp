@@ -74,6 +74,7 @@ void applyLog(const Config& config) {
 ServiceOptions serviceOptions(const Config& config) {
   ServiceOptions options;
   options.log = logServiceLine;
+  options.changes = logChange;
   options.maxDepth = static_cast<std::size_t>(config.nesting);
   options.pullDefaultTimeout = std::chrono::seconds(config.pullSeconds);
   options.pullMaxTimeout = std::chrono::seconds(config.pullLongestSeconds);

@@ -24,6 +24,7 @@ struct HttpRequest {
   std::string body;
   bool takesTrailers = false;  ///< the client said TE: trailers
   std::string client = {};     ///< who sent it, for what is limited by client
+  std::string peer = {};       ///< the client's address and port
 };
 
 /// Thrown by ResponseSink::write when the client has gone: nobody waits for the rest.

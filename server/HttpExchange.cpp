@@ -34,6 +34,7 @@ std::string fieldText(std::string_view text) {
 HttpExchange::HttpExchange(MHD_Connection* connection, std::shared_ptr<Connection> client_, std::string path)
     : client(std::move(client_)), connection_(connection) {
   request.path = std::move(path);
+  request.peer = client->peer();
 }
 
 // ---- The worker ----

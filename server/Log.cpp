@@ -85,6 +85,8 @@ void logServiceLine(broker::LogLevel level, std::string_view text) noexcept try 
   // Lost, as a line that cannot be written.
 }
 
+void logChange(const std::string& line) noexcept { logLine(Level::Change, line, "service", __FILE__, __LINE__); }
+
 void logBrokerLine(broker::LogLevel level, std::string_view text) noexcept try {
   const int number = numberOf(level);
   if (number >= threshold.load(std::memory_order_relaxed)) {

@@ -12,6 +12,7 @@ namespace zorva::server {
 /// On the scale of the agent's levels.
 enum class Level : int {
   Request = 4500,  ///< a line for each request; what the providers tell about their work lies below
+  Change = 5000,   ///< who has changed what
   Warning = 5000,  ///< requests that were refused, clients that were cut off, providers that do not return
   Error = 6000,    ///< what keeps the server itself from its work
 };
@@ -31,6 +32,9 @@ void logBrokerLine(broker::LogLevel level, std::string_view text) noexcept;
 
 /// Takes the lines about requests, which clients can bring about.
 void logServiceLine(broker::LogLevel level, std::string_view text) noexcept;
+
+/// Takes a line about a change that a client has made. None of them is left out.
+void logChange(const std::string& line) noexcept;
 
 #define ZORVA_LOG(level, text)                                                                                  \
   ::zorva::server::logLine(::zorva::server::Level::level, (text), static_cast<const char*>(__func__), __FILE__, \

@@ -5,6 +5,7 @@
 #include "broker/PathText.h"
 #include "cimxml/ElementWriter.h"
 #include "cmpidt.h"
+#include "schema/Utf8.h"
 
 namespace zorva::server {
 
@@ -43,7 +44,7 @@ template <class Parameters>
 std::string_view twice(const Parameters& parameters) {
   std::vector<std::string_view> names;
   for (const auto& one : parameters) names.push_back(one.name);
-  std::sort(names.begin(), names.end(), schema::NameLess());
+  std::stable_sort(names.begin(), names.end(), schema::NameLess());
   const auto found = std::adjacent_find(names.begin(), names.end(), schema::NameEqual());
   return found != names.end() ? *found : std::string_view();
 }
@@ -76,6 +77,15 @@ Status carryOut(Operation& operation) {
   }
   Status status = checkParameterNames(call);
   return asCim(status.ok() ? function(operation) : std::move(status));
+}
+
+void noteChange(const Operation& operation, std::string_view what, const broker::ObjectPath& path,
+                const std::vector<std::string>& names) {
+  constexpr std::size_t kLongestPath = 1000;
+  const std::string text = broker::pathText(path);
+  std::string line = std::string(what) + " " + text.substr(0, schema::utf8Cut(text, kLongestPath));
+  for (const std::string& name : names) line += (&name == names.data() ? ": " : ", ") + name;
+  operation.noteChange(line);
 }
 
 void settleValue(const Operation& operation, broker::Value& value) {
@@ -177,6 +187,19 @@ Status checkSaidTypes(const Operation& operation) {
   return {};
 }
 
+/// What a method does is not known here: one that ends well counts as a change, but for the one that is known to read.
+void noteCall(const Operation& operation, const broker::ObjectPath& path, const broker::MethodResult& result) {
+  const broker::Scalar& value = result.returnValue.scalar;
+  const bool isDone = result.returnValue.isNull || value == broker::Scalar(std::uint64_t{0}) ||
+                      value == broker::Scalar(std::int64_t{0});
+  const schema::Class* declared = operation.classes().find(path.className);
+  const schema::ClassMethod* method = declared != nullptr ? declared->findMethod(operation.call.name) : nullptr;
+  if (!isDone || method == nullptr || method->name == "GetCentralInstances") return;
+  std::vector<std::string> names;
+  for (const broker::NamedValue& argument : operation.call.input) names.push_back(argument.name);
+  noteChange(operation, "called " + method->name + " of", path, names);
+}
+
 }  // namespace
 
 Status invokeMethod(Operation& operation) {
@@ -189,6 +212,7 @@ Status invokeMethod(Operation& operation) {
   broker::MethodResult result;
   status = operation.broker.invokeMethod(path, operation.call.name, input, result, operation.caller);
   if (!status.ok()) return status;
+  noteCall(operation, path, result);
   std::string& out = operation.writer.out();
   if (!result.returnValue.isNull) cimxml::appendReturnValue(out, result.returnValue);
   for (const broker::NamedValue& value : result.output) {

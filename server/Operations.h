@@ -1,8 +1,10 @@
 #pragma once
 
 #include <exception>
+#include <functional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "broker/Broker.h"
 #include "cimxml/RequestReader.h"
@@ -26,6 +28,8 @@ struct Operation {
   const std::string& client;    ///< HttpRequest::client
   std::string_view hostHeader;  ///< as the client named this host
   std::string nameSpace;        ///< as the registry spells it
+  /// Takes the rest of a line that says what the client has changed.
+  std::function<void(const std::string& what)> noteChange;
 
   const schema::ClassRepository& classes() const { return broker.classes(); }
 };
@@ -52,6 +56,11 @@ broker::Status invokeMethod(Operation& operation);
 broker::Status settlePath(const Operation& operation, broker::ObjectPath& path);
 /// The same for the references among a value.
 void settleValue(const Operation& operation, broker::Value& value);
+
+/// Leaves a line about a change that succeeded: what was done to which object, and which of its properties or
+/// parameters were named.
+void noteChange(const Operation& operation, std::string_view what, const broker::ObjectPath& path,
+                const std::vector<std::string>& names = {});
 
 /// Carries what the writer throws past a provider, which must not see it: write in put(), then finish().
 class Stream {

@@ -1,3 +1,5 @@
+#include <algorithm>
+
 #include "cimxml/ElementWriter.h"
 #include "cmpidt.h"
 #include "server/Operations.h"
@@ -84,10 +86,35 @@ Status createInstance(Operation& operation) {
   ObjectPath created;
   status = operation.broker.createInstance(instance, created, operation.caller);
   if (!status.ok()) return status;
+  noteChange(operation, "created", created);
   operation.writer.beginReturnValue();
   cimxml::appendInstanceName(operation.writer.out(), created);
   operation.writer.endReturnValue();
   return {};
+}
+
+/// The properties that a modification gives and its list lets through, without keys, as the class spells them.
+std::vector<std::string> changedNames(const Operation& operation, const Instance& instance,
+                                      const std::optional<std::vector<std::string>>& propertyList) {
+  const schema::Class* declared = operation.classes().find(instance.path.className);
+  std::vector<std::string> names;
+  for (const broker::Property& property : instance.properties) {
+    const schema::ClassProperty* known = declared != nullptr ? declared->findProperty(property.name) : nullptr;
+    const auto isIt = [&property](const std::string& listed) { return schema::sameName(listed, property.name); };
+    if (known == nullptr || known->isKey) continue;
+    if (propertyList && std::none_of(propertyList->begin(), propertyList->end(), isIt)) continue;
+    names.push_back(known->name);
+  }
+  return names;
+}
+
+Status modifyAndNote(const Operation& operation, const Instance& instance,
+                     const std::optional<std::vector<std::string>>& propertyList) {
+  Status status = operation.broker.modifyInstance(instance, propertyList, operation.caller);
+  if (!status.ok()) return status;
+  const std::vector<std::string> names = changedNames(operation, instance, propertyList);
+  if (!names.empty()) noteChange(operation, "changed", instance.path, names);
+  return status;
 }
 
 Status modifyInstance(Operation& operation) {
@@ -99,7 +126,7 @@ Status modifyInstance(Operation& operation) {
   if (status.ok()) status = settlePath(operation, instance.path);
   if (!status.ok()) return status;
   settleProperties(operation, instance);
-  return operation.broker.modifyInstance(instance, propertyList, operation.caller);
+  return modifyAndNote(operation, instance, propertyList);
 }
 
 Status deleteInstance(Operation& operation) {
@@ -107,7 +134,9 @@ Status deleteInstance(Operation& operation) {
   ObjectPath path = arguments.requiredPath("InstanceName");
   Status status = arguments.status();
   if (status.ok()) status = settlePath(operation, path);
-  return status.ok() ? operation.broker.deleteInstance(path, operation.caller) : status;
+  if (status.ok()) status = operation.broker.deleteInstance(path, operation.caller);
+  if (status.ok()) noteChange(operation, "deleted", path);
+  return status;
 }
 
 /// The property that an operation names.
@@ -156,7 +185,7 @@ Status setProperty(Operation& operation) {
   settleValue(operation, value);
   if (value.isNull) value = broker::Value::null(property->type, property->isArray);
   instance.properties.push_back({property->name, std::move(value), property});
-  return operation.broker.modifyInstance(instance, std::vector<std::string>{property->name}, operation.caller);
+  return modifyAndNote(operation, instance, std::vector<std::string>{property->name});
 }
 
 }  // namespace

@@ -314,8 +314,8 @@ TEST_F(OperationsTest, AMethodCallThatIsWrongIsAnError) {
 
 TEST_F(OperationsTest, ATypeThatAClientNamesIsTheDeclaredOne) {
   const auto echo = [&](const std::string& name, const std::string& type, const std::string& value) {
-    return invoke("Echo", thing("a"), "<PARAMVALUE NAME=\"" + name + "\" PARAMTYPE=\"" + type + "\">" + value +
-                                          "</PARAMVALUE>");
+    return invoke("Echo", thing("a"),
+                  "<PARAMVALUE NAME=\"" + name + "\" PARAMTYPE=\"" + type + "\">" + value + "</PARAMVALUE>");
   };
   const std::string five = "<VALUE>5</VALUE>";
   EXPECT_THAT(echo("text", "uint32", five),
@@ -331,8 +331,8 @@ TEST_F(OperationsTest, ATypeThatAClientNamesIsTheDeclaredOne) {
 
 TEST_F(OperationsTest, AMethodOfAClassThatDoesNotExistIsNotFound) {
   const auto call = [&](const std::string& target, const std::string& method, const std::string& object) {
-    const std::string content = "<SIMPLEREQ><METHODCALL NAME=\"" + method + "\">" + target +
-                                "</METHODCALL></SIMPLEREQ>";
+    const std::string content =
+        "<SIMPLEREQ><METHODCALL NAME=\"" + method + "\">" + target + "</METHODCALL></SIMPLEREQ>";
     return service_
         .ask(testing::post(testing::message(content),
                            {{"CIMOperation", "MethodCall"}, {"CIMMethod", method}, {"CIMObject", object}}))
@@ -355,10 +355,51 @@ TEST_F(OperationsTest, AMethodOfAClassThatDoesNotExistIsNotFound) {
 TEST_F(OperationsTest, AParameterThatIsThereTwiceIsAWrongOne) {
   const std::string name = className("ClassName", "T_Thing");
   EXPECT_EQ(errorOf("EnumerateInstanceNames", name + className("CLASSNAME", "T_Other")),
-            "4 EnumerateInstanceNames: the parameter &quot;CLASSNAME&quot; is there twice");
+            "4 EnumerateInstanceNames: the parameter &quot;ClassName&quot; is there twice");
   const std::string text = "<PARAMVALUE NAME=\"Text\"><VALUE>x</VALUE></PARAMVALUE>";
   EXPECT_THAT(invoke("Echo", thing("a"), text + text),
               HasSubstr("<ERROR CODE=\"4\" DESCRIPTION=\"Echo: the parameter &quot;Text&quot; is there twice"));
+}
+
+// Changes.
+
+TEST_F(OperationsTest, AChangeLeavesALineThatSaysWhoChangedWhat) {
+  const auto modify = [&](const std::string& more) {
+    ask("ModifyInstance", parameter("ModifiedInstance",
+                                    "<VALUE.NAMEDINSTANCE>" + thing("a") +
+                                        R"(<INSTANCE CLASSNAME="T_Thing"><PROPERTY NAME="Name" TYPE="string"><VALUE>a)"
+                                        R"(</VALUE></PROPERTY><PROPERTY NAME="size" TYPE="uint16"><VALUE>9</VALUE>)"
+                                        R"(</PROPERTY><PROPERTY NAME="Wide" TYPE="uint32"><VALUE>1</VALUE></PROPERTY>)"
+                                        "</INSTANCE></VALUE.NAMEDINSTANCE>") +
+                              more);
+  };
+  modify("");
+  modify(names("PropertyList", {"WIDE"}));
+  modify(names("PropertyList", {}));
+  ask("SetProperty", parameter("InstanceName", thing("a")) + text("PropertyName", "size") + text("NewValue", "12"));
+  invoke("Call", thing("a"), "<PARAMVALUE NAME=\"Text\"><VALUE>x</VALUE></PARAMVALUE>");
+  ask("DeleteInstance", parameter("InstanceName", thing("a")));
+  EXPECT_THAT(service_.changes(),
+              ::testing::ElementsAre("192.0.2.1:4711 changed root/cimv2:T_Thing.Name=\"a\": Size, Wide",
+                                     "192.0.2.1:4711 changed root/cimv2:T_Thing.Name=\"a\": Wide",
+                                     "192.0.2.1:4711 changed root/cimv2:T_Thing.Name=\"a\": Size",
+                                     "192.0.2.1:4711 called Call of root/cimv2:T_Thing.Name=\"a\": Text",
+                                     "192.0.2.1:4711 deleted root/cimv2:T_Thing.Name=\"a\""));
+}
+
+TEST_F(OperationsTest, WhatFailsOrReadsLeavesNoLineOfAChange) {
+  errorOf("SetProperty", parameter("InstanceName", thing("a")) + text("PropertyName", "Size") + text("NewValue", "x"));
+  errorOf("DeleteInstance", parameter("InstanceName", thing("b")));
+  invoke("Echo", thing("a"), "<PARAMVALUE NAME=\"Times\"><VALUE>3</VALUE></PARAMVALUE>");  // it returns 3
+  ask("EnumerateInstances", className("ClassName", "T_Thing"));
+  EXPECT_THAT(service_.changes(), ::testing::IsEmpty());
+}
+
+TEST_F(OperationsTest, AClientWritesNoLinesOfItsOwnIntoTheLineOfAChange) {
+  ask("CreateInstance", parameter("NewInstance", R"(<INSTANCE CLASSNAME="T_Thing"><PROPERTY NAME="Name" TYPE="string">)"
+                                                 "<VALUE>x&#10;2026 forged&#127;</VALUE></PROPERTY></INSTANCE>"));
+  ASSERT_EQ(service_.changes().size(), 1U);
+  EXPECT_THAT(service_.changes()[0], HasSubstr("created root/cimv2:T_Thing.Name=\"x\\n2026 forged?"));
 }
 
 // What goes wrong.

@@ -93,6 +93,13 @@ LateAnswer lateAnswer(const cimxml::CimRequest& request, const CimHeaders& heade
   };
 }
 
+/// What clients send is in the lines of the log: it must not look like a line of its own.
+std::string withoutControls(std::string text) {
+  std::replace_if(
+      text.begin(), text.end(), [](unsigned char c) { return c < 0x20 || c == 0x7F; }, '?');
+  return text;
+}
+
 /// The memory that this thread's responses gather in, used again and again.
 class Buffer {
  public:
@@ -135,18 +142,15 @@ class ServiceCore {
     caller.acceptLanguage = headers.acceptLanguage;
     caller.contentLanguage = headers.contentLanguage;
     sink.setLateAnswer(lateAnswer(request, headers));
-    answer(request, headers, caller, http.client, sink);
+    answer(request, {headers, caller, http}, sink);
   }
 
   void reclaim() { pulls_.reclaim(); }
 
-  /// What clients send stands in these lines: it must not look like a line of its own.
   void log(LogLevel level, std::string text) const noexcept {
     if (!options_.log) return;
     try {
-      std::replace_if(
-          text.begin(), text.end(), [](unsigned char c) { return c < 0x20 || c == 0x7F; }, '?');
-      options_.log(level, text);
+      options_.log(level, withoutControls(std::move(text)));
     } catch (...) {
       // A log that fails must not fail the request.
     }
@@ -162,17 +166,25 @@ class ServiceCore {
     sink.write(refusal.message + "\n");
   }
 
-  void answer(const cimxml::CimRequest& request, const CimHeaders& headers, const broker::Caller& caller,
-              const std::string& client, ResponseSink& sink) {
+  /// Who asks, as far as the request says so.
+  struct Client {
+    const CimHeaders& headers;
+    const broker::Caller& caller;
+    const HttpRequest& http;
+  };
+
+  void answer(const cimxml::CimRequest& request, const Client& client, ResponseSink& sink) {
     Buffer buffer;
     cimxml::ResponseWriter writer(buffer.text(), options_.unsentText, [&](std::string_view text) {
-      if (!sink.begun()) sink.begin(200, responseHeaders(headers));
+      if (!sink.begun()) sink.begin(200, responseHeaders(client.headers));
       sink.write(text);
     });
     writer.beginMessage(request.id, request.isMultiple);
     for (const cimxml::Call& call : request.calls) {
       writer.beginResponse(call.name, call.isExtrinsic);
-      Operation operation{broker_, pulls_, host_, caller, call, writer, client, headers.host, {}};
+      const auto note = [&](const std::string& what) { noteChange(client.http.peer + " " + what); };
+      Operation operation{broker_, pulls_, host_, client.caller, call, writer, client.http.client, client.headers.host,
+                          {},      note};
       const Status status = carryOutSafely(operation);
       if (!status.ok()) {
         const std::string text(broker::statusName(status.rc));
@@ -184,6 +196,12 @@ class ServiceCore {
       writer.endResponse();
     }
     writer.endMessage();
+  }
+
+  void noteChange(const std::string& line) const noexcept try {
+    if (options_.changes) options_.changes(withoutControls(line));
+  } catch (...) {
+    // A log that fails must not fail the request.
   }
 
   Status carryOutSafely(Operation& operation) const {

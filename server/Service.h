@@ -21,6 +21,8 @@ struct ServiceOptions {
   std::string hostName;
   /// Where log lines go; may be empty. Called on any thread.
   broker::LogHook log;
+  /// Takes a line for each change that was made: who, which object, and what of it. May be empty. Called on any thread.
+  std::function<void(const std::string& line)> changes;
 
   std::size_t maxDepth = 128;       ///< the most elements, one within another, in a request
   std::size_t maxOperations = 100;  ///< the most operations in one multiple request

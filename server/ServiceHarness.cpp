@@ -91,7 +91,7 @@ std::string message(const std::string& content) {
 }
 
 HttpRequest post(const std::string& body, HeaderList headers) {
-  return {"POST", "/cimom", std::move(headers), body, false};
+  return {"POST", "/cimom", std::move(headers), body, false, {}, "192.0.2.1:4711"};
 }
 
 HttpRequest request(const std::string& operation, const std::string& parameters, const std::string& nameSpace) {
@@ -118,6 +118,10 @@ TestService::TestService(ServiceOptions options) {
   broker_.emplace(broker::testing::testClasses(), std::move(made));
   options.hostName = "this";
   options.log = log();
+  options.changes = [this](const std::string& line) {
+    const std::lock_guard lock(mutex_);
+    changes_.push_back(line);
+  };
   service_.emplace(*broker_, std::move(options));
 }
 
@@ -143,6 +147,11 @@ std::string TestService::ask(const std::string& operation, const std::string& pa
   EXPECT_EQ(sink.status, 200) << sink.body;
   EXPECT_EQ(sink.header("CIMOperation"), "MethodResponse");
   return sink.body;
+}
+
+std::vector<std::string> TestService::changes() {
+  const std::lock_guard lock(mutex_);
+  return changes_;
 }
 
 std::vector<std::string> TestService::lines() {

@@ -65,6 +65,8 @@ class TestService {
                   const std::string& nameSpace = "root/cimv2");
 
   std::vector<std::string> lines();
+  /// The lines about changes.
+  std::vector<std::string> changes();
   broker::Broker& broker() { return *broker_; }
   Service& service() { return *service_; }
 
@@ -73,6 +75,7 @@ class TestService {
 
   std::mutex mutex_;
   std::vector<std::string> lines_;
+  std::vector<std::string> changes_;
   std::optional<broker::Broker> broker_;
   std::optional<Service> service_;
 };
