@@ -93,6 +93,20 @@ void mendSettings() noexcept {
   }
 }
 
+/// The address as a person types it.
+std::string shortUrl(const std::string& url) {
+  return url.starts_with("http://127.0.0.1:") ? "http://localhost" + url.substr(16) : url;
+}
+
+/// What GET of "/" shows.
+std::string pageText(const std::string& url) {
+  return "This is zorvacimd " ZORVA_VERSION
+         ", a CIM server: it publishes the DNS client configuration of this host.\n"
+         "Programs ask it by CIM-XML over HTTP POST (DSP0200), which a browser does not speak. These do:\n\n"
+         "  wbemcli ein " +
+         url + "/root/cimv2:ZORVA_DNSProtocolEndPoint\n  zorvactl --url " + url + "/root/cimv2 show\n";
+}
+
 class Daemon {
  public:
   Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBroker);
@@ -138,7 +152,8 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
   service_ = std::make_unique<Service>(*broker_, serviceOptions(config_));
   server_ = std::make_unique<HttpServer>(
       config_.limits, config_.threads,
-      [service = service_.get()](const HttpRequest& request, ResponseSink& sink) { service->handle(request, sink); });
+      [service = service_.get()](const HttpRequest& request, ResponseSink& sink) { service->handle(request, sink); },
+      pageText(shortUrl(listeners_.front().url)));
 }
 
 void Daemon::greet() const {
@@ -148,8 +163,7 @@ void Daemon::greet() const {
   for (const Listener& each : listeners_) text += (&each == listeners_.data() ? "" : " and ") + each.url;
   text += '\n';
   if (commandLine_.greet || isTerminal) {
-    const std::string& first = listeners_.front().url;
-    const std::string url = first.starts_with("http://127.0.0.1:") ? "http://localhost" + first.substr(16) : first;
+    const std::string url = shortUrl(listeners_.front().url);
     text += "ask it:  wbemcli ein " + url + "/root/cimv2:ZORVA_DNSProtocolEndPoint\n";
     text += "    or:  zorvactl --url " + url + "/root/cimv2 show\n";
   }

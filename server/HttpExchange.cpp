@@ -249,7 +249,7 @@ MHD_Response* HttpExchange::makeResponse() {
 }
 
 void HttpExchange::addHeaders(MHD_Response& response) const {
-  for (const auto& [name, value] : headers_) MHD_add_response_header(&response, name.c_str(), value.c_str());
+  for (const auto& [name, value] : headers_) addHeader(response, name, value);
   if (gzip_ != nullptr) MHD_add_response_header(&response, MHD_HTTP_HEADER_CONTENT_ENCODING, "gzip");
   if (streaming_ && request.takesTrailers && isHttp11) {
     MHD_add_response_header(&response, MHD_HTTP_HEADER_TRAILER, "CIMStatusCode, CIMStatusCodeDescription");
@@ -303,21 +303,23 @@ void HttpExchange::ended() {
 HeaderList headersOf(const Refusal& refusal) {
   HeaderList headers{{MHD_HTTP_HEADER_CONTENT_TYPE, "text/plain; charset=utf-8"}};
   if (!refusal.cimError.empty()) headers.emplace_back("CIMError", refusal.cimError);
-  if (refusal.status == 405 || refusal.status == 501) headers.emplace_back(MHD_HTTP_HEADER_ALLOW, kAllowedMethods);
+  if (!refusal.allow.empty()) headers.emplace_back(MHD_HTTP_HEADER_ALLOW, refusal.allow);
   if (refusal.status == 503) headers.emplace_back(MHD_HTTP_HEADER_RETRY_AFTER, "1");
   return headers;
 }
 
 std::string textOf(const Refusal& refusal) { return refusal.why + "\n"; }
 
+void addHeader(MHD_Response& response, const std::string& name, const std::string& value) {
+  MHD_add_response_header(&response, name.c_str(), value.empty() ? " " : value.c_str());
+}
+
 MHD_Result respondWith(MHD_Connection* connection, const Refusal& refusal) {
   const std::string text = textOf(refusal);
   MHD_Response* response =
       MHD_create_response_from_buffer(text.size(), const_cast<char*>(text.data()), MHD_RESPMEM_MUST_COPY);
   if (response == nullptr) return MHD_NO;
-  for (const auto& [name, value] : headersOf(refusal)) {
-    MHD_add_response_header(response, name.c_str(), value.c_str());
-  }
+  for (const auto& [name, value] : headersOf(refusal)) addHeader(*response, name, value);
   MHD_add_response_header(response, MHD_HTTP_HEADER_CONNECTION, "close");
   const MHD_Result queued = MHD_queue_response(connection, static_cast<unsigned int>(refusal.status), response);
   MHD_destroy_response(response);

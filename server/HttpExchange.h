@@ -146,6 +146,9 @@ class HttpExchange final : public ResponseSink {
 HeaderList headersOf(const Refusal& refusal);
 std::string textOf(const Refusal& refusal);
 
+/// Adds a header field to a response. The HTTP library takes no empty value; a blank is one (RFC 9110 5.5).
+void addHeader(MHD_Response& response, const std::string& name, const std::string& value);
+
 /// Queues the response of a refusal for a connection, which is closed after it.
 MHD_Result respondWith(MHD_Connection* connection, const Refusal& refusal);
 

@@ -44,7 +44,7 @@ std::string withoutLineEnd(std::string text) {
 
 class HttpServer::Core {
  public:
-  Core(const HttpLimits& limits, int threads, Handler handler);
+  Core(const HttpLimits& limits, int threads, Handler handler, std::string page);
   ~Core();
 
   void take(int socket, const sockaddr_storage& peer, socklen_t peerSize);
@@ -69,6 +69,7 @@ class HttpServer::Core {
   MHD_Result readHead(Holder& exchange, MHD_Connection* connection, const char* method, const char* version);
   void readBody(HttpExchange& exchange, std::string_view data);
   void releaseBody(HttpExchange& exchange);
+  bool answersAtOnce(HttpExchange& exchange) const;
   MHD_Result requestIsWhole(const Holder& exchange);
   void logRefusal(const HttpExchange& exchange, const Refusal& refusal) const;
   void logAnswer(const HttpExchange& exchange) const;
@@ -77,6 +78,7 @@ class HttpServer::Core {
 
   mutable std::mutex limitsMutex_;
   HttpLimits limits_;
+  const std::string page_;
   Connections connections_;
   Workers workers_;
   std::atomic<std::size_t> bodies_ = 0;  ///< bytes of unfinished requests
@@ -84,8 +86,9 @@ class HttpServer::Core {
   MHD_Daemon* daemon_ = nullptr;
 };
 
-HttpServer::Core::Core(const HttpLimits& limits, int threads, Handler handler)
+HttpServer::Core::Core(const HttpLimits& limits, int threads, Handler handler, std::string page)
     : limits_(limits),
+      page_(std::move(page)),
       workers_(limits, [work = std::move(handler)](HttpExchange& exchange) { work(exchange.request, exchange); }) {
   startDaemon(threads);
 }
@@ -222,7 +225,7 @@ MHD_Result HttpServer::Core::readHead(Holder& exchange, MHD_Connection* connecti
   exchange->isHttp11 = std::strcmp(version, "HTTP/1.1") == 0;
 
   const HttpLimits now = limits();
-  if (auto refusal = checkHead({request.method, version, request.headers}, now.bodyBytes)) {
+  if (auto refusal = checkHead({request.method, request.path, version, request.headers}, now.bodyBytes)) {
     logRefusal(*exchange, *refusal);
     exchange->client->enter(Phase::Sending);
     return respondWith(connection, *refusal);
@@ -253,13 +256,24 @@ void HttpServer::Core::releaseBody(HttpExchange& exchange) {
   exchange.client->hold(0);
 }
 
+/// What needs no worker.
+bool HttpServer::Core::answersAtOnce(HttpExchange& exchange) const {
+  const HttpRequest& request = exchange.request;
+  if (request.method == "OPTIONS") {
+    exchange.begin(200, capabilities(request.path));
+  } else if (asksForPage(request.method, request.path)) {
+    exchange.begin(200, {{MHD_HTTP_HEADER_CONTENT_TYPE, "text/plain; charset=utf-8"}});
+    exchange.write(page_);
+  } else {
+    return false;
+  }
+  exchange.finish({});
+  return true;
+}
+
 MHD_Result HttpServer::Core::requestIsWhole(const Holder& exchange) {
   releaseBody(*exchange);
-  if (exchange->request.method == "OPTIONS") {
-    exchange->begin(200, capabilities());
-    exchange->finish({});
-    return exchange->respond();
-  }
+  if (answersAtOnce(*exchange)) return exchange->respond();
   exchange->client->enter(Phase::Working);
   exchange->suspend();
   if (!exchange->refusal.has_value()) exchange->refusal = workers_.submit(exchange, connections_);
@@ -310,8 +324,8 @@ void HttpServer::Core::onLog(void*, const char* format, va_list arguments) {
 
 // ---- HttpServer ----
 
-HttpServer::HttpServer(const HttpLimits& limits, int threads, Handler handler)
-    : core_(std::make_unique<Core>(limits, threads, std::move(handler))) {}
+HttpServer::HttpServer(const HttpLimits& limits, int threads, Handler handler, std::string page)
+    : core_(std::make_unique<Core>(limits, threads, std::move(handler), std::move(page))) {}
 
 HttpServer::~HttpServer() = default;
 

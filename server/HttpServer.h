@@ -23,9 +23,9 @@ class HttpServer {
   using Handler = std::function<void(const HttpRequest&, ResponseSink&)>;
 
   /// A request whose handler does not return in time gets the late answer that the handler has set, on the thread that
-  /// sweeps; without one, a status of 500 with a sentence. Throws std::runtime_error where the threads cannot be
-  /// started.
-  HttpServer(const HttpLimits& limits, int threads, Handler handler);
+  /// sweeps; without one, a status of 500 with a sentence. `page` is the text that GET of "/" gives. Throws
+  /// std::runtime_error where the threads cannot be started.
+  HttpServer(const HttpLimits& limits, int threads, Handler handler, std::string page = {});
 
   /// Ends all connections, and waits for handlers that have not returned.
   ~HttpServer();

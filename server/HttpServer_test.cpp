@@ -56,9 +56,9 @@ class Gate {
 /// An HTTP server on a free port, with a thread that accepts and sweeps.
 class Server {
  public:
-  explicit Server(HttpServer::Handler handler, const HttpLimits& limits = {})
+  explicit Server(HttpServer::Handler handler, const HttpLimits& limits = {}, std::string page = {})
       : listeners_(listenOn(Addresses{"127.0.0.1"}, 0)),
-        server_(limits, 2, std::move(handler)),
+        server_(limits, 2, std::move(handler), std::move(page)),
         thread_([this] { run(); }) {}
   ~Server() {
     ending_ = true;
@@ -486,12 +486,40 @@ TEST(HttpServer, OptionsTellWhatTheServerCan) {
   EXPECT_EQ(response.status, 200);
   EXPECT_EQ(response.headers.at("allow"), "POST, M-POST, OPTIONS");
   EXPECT_EQ(response.headers.at("77-cimprotocolversion"), "1.4");
+  ASSERT_EQ(response.headers.count("77-cimsupportedmultipleoperations"), 1U);
+  EXPECT_EQ(response.headers.at("77-cimsupportedmultipleoperations"), "");
+}
+
+TEST(HttpServer, HeaderFieldsWithoutAValueAreSent) {
+  Server server([](const HttpRequest&, ResponseSink& sink) {
+    sink.begin(200, {{"Content-Type", "application/xml"}, {"Ext", ""}});
+    sink.write("x");
+  });
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send(testing::posting("x")));
+  const WireResponse response = wire.receive();
+  ASSERT_EQ(response.headers.count("ext"), 1U);
+  EXPECT_EQ(response.headers.at("ext"), "");
+}
+
+TEST(HttpServer, TheRootSaysToAPersonWhatThisIs) {
+  Server server(echo, {}, "This is a server.\n");
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send("GET / HTTP/1.1\r\nHost: x\r\n\r\n"));
+  const WireResponse page = wire.receive();
+  EXPECT_EQ(page.status, 200);
+  EXPECT_EQ(page.headers.at("content-type"), "text/plain; charset=utf-8");
+  EXPECT_EQ(page.body, "This is a server.\n");
+  ASSERT_TRUE(wire.send("HEAD / HTTP/1.1\r\nHost: x\r\nConnection: close\r\n\r\n"));
+  const std::string head = wire.take(10000, seconds(20));
+  EXPECT_THAT(head, ::testing::StartsWith("HTTP/1.1 200 "));
+  EXPECT_THAT(head, ::testing::EndsWith("\r\n\r\n"));
 }
 
 TEST(HttpServer, OtherMethodsAreTurnedDown) {
   Server server(echo);
   Wire get(server.port());
-  ASSERT_TRUE(get.send("GET / HTTP/1.1\r\nHost: x\r\n\r\n"));
+  ASSERT_TRUE(get.send("GET /cimom HTTP/1.1\r\nHost: x\r\n\r\n"));
   const WireResponse response = get.receive();
   EXPECT_EQ(response.status, 405);
   EXPECT_EQ(response.headers.at("allow"), "POST, M-POST, OPTIONS");

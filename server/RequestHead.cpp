@@ -104,11 +104,16 @@ std::optional<Refusal> checkFraming(const RequestHead& head, std::size_t most) {
 
 std::optional<Refusal> checkMethod(const RequestHead& head) {
   if (head.method == "POST" || head.method == "M-POST" || head.method == "OPTIONS") return std::nullopt;
+  if (asksForPage(head.method, head.path)) return std::nullopt;
   constexpr std::string_view kKnown[] = {"GET", "HEAD", "PUT", "DELETE", "PATCH", "TRACE", "CONNECT"};
   if (std::find(std::begin(kKnown), std::end(kKnown), head.method) != std::end(kKnown)) {
-    return Refusal{405, "CIM operations come by POST or M-POST (DSP0200); a browser cannot show them", {}};
+    return Refusal{405,
+                   "CIM operations come by POST or M-POST (DSP0200); a browser cannot show them",
+                   {},
+                   allowedMethods(head.path)};
   }
-  return Refusal{501, "there is no such method here; CIM operations come by POST or M-POST", {}};
+  return Refusal{
+      501, "there is no such method here; CIM operations come by POST or M-POST", {}, allowedMethods(head.path)};
 }
 
 bool isUtf8Name(std::string_view charset) {
@@ -191,7 +196,7 @@ std::optional<Refusal> checkHead(const RequestHead& head, std::size_t mostBodyBy
   if (auto refusal = checkFraming(head, mostBodyBytes)) return refusal;
   if (auto refusal = checkMethod(head)) return refusal;
   if (auto refusal = checkExpect(head.headers)) return refusal;
-  if (head.method == "OPTIONS") return std::nullopt;
+  if (head.method == "OPTIONS" || asksForPage(head.method, head.path)) return std::nullopt;
   if (findHeader(head.headers, "Content-Length") == nullptr &&
       findHeader(head.headers, "Transfer-Encoding") == nullptr) {
     return Refusal{411, "a request needs a Content-Length, or a chunked body", {}};
@@ -200,12 +205,20 @@ std::optional<Refusal> checkHead(const RequestHead& head, std::size_t mostBodyBy
   return checkAccept(head.headers);
 }
 
-HeaderList capabilities() {
-  return {{"Allow", std::string(kAllowedMethods)},
+std::string_view allowedMethods(std::string_view path) {
+  return path == "/" ? "GET, HEAD, POST, M-POST, OPTIONS" : "POST, M-POST, OPTIONS";
+}
+
+bool asksForPage(std::string_view method, std::string_view path) {
+  return path == "/" && (method == "GET" || method == "HEAD");
+}
+
+HeaderList capabilities(std::string_view path) {
+  // Qualifier types can be read, but not be changed, so their group is not among the others.
+  return {{"Allow", std::string(allowedMethods(path))},
           {"Opt", "http://www.dmtf.org/cim/mapping/http/v1.0 ; ns=77"},
           {"77-CIMProtocolVersion", "1.4"},
-          {"77-CIMSupportedFunctionalGroups",
-           "basic-read, basic-write, instance-manipulation, association-traversal, qualifier-declaration"},
+          {"77-CIMSupportedFunctionalGroups", "basic-read, basic-write, instance-manipulation, association-traversal"},
           {"77-CIMSupportedMultipleOperations", ""},
           {"77-CIMValidation", "loosely-validating"}};
 }

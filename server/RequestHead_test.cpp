@@ -20,7 +20,7 @@ HeaderList usual() {
 std::optional<Refusal> check(HeaderList more, std::string_view method = "POST", std::string_view version = "HTTP/1.1") {
   HeaderList headers = usual();
   headers.insert(headers.end(), more.begin(), more.end());
-  return checkHead({method, version, headers}, kMost);
+  return checkHead({method, "/", version, headers}, kMost);
 }
 
 std::optional<Refusal> checkInstead(const std::string& name, const std::string& value) {
@@ -28,14 +28,14 @@ std::optional<Refusal> checkInstead(const std::string& name, const std::string& 
   for (auto& [each, old] : headers) {
     if (each == name) old = value;
   }
-  return checkHead({"POST", "HTTP/1.1", headers}, kMost);
+  return checkHead({"POST", "/", "HTTP/1.1", headers}, kMost);
 }
 
 std::optional<Refusal> checkWithout(const std::string& name, HeaderList more) {
   HeaderList headers = usual();
   std::erase_if(headers, [&](const auto& field) { return field.first == name; });
   headers.insert(headers.end(), more.begin(), more.end());
-  return checkHead({"POST", "HTTP/1.1", headers}, kMost);
+  return checkHead({"POST", "/", "HTTP/1.1", headers}, kMost);
 }
 
 int statusOf(const std::optional<Refusal>& refusal) { return refusal.has_value() ? refusal->status : 200; }
@@ -75,7 +75,7 @@ TEST(RequestHead, ChunksBelongToHttp11) {
   HeaderList headers = usual();
   std::erase_if(headers, [](const auto& field) { return field.first == "Content-Length"; });
   headers.emplace_back("Transfer-Encoding", "chunked");
-  EXPECT_EQ(statusOf(checkHead({"POST", "HTTP/1.0", headers}, kMost)), 400);
+  EXPECT_EQ(statusOf(checkHead({"POST", "/", "HTTP/1.0", headers}, kMost)), 400);
 }
 
 TEST(RequestHead, ALengthIsDigitsAndNothingElse) {
@@ -111,11 +111,30 @@ TEST(RequestHead, NamesAndValuesHaveNoCharactersThatHideOthers) {
 }
 
 TEST(RequestHead, KnownMethodsAreNotAllowedAndOthersNotImplemented) {
-  for (const char* method : {"GET", "HEAD", "PUT", "DELETE", "TRACE", "CONNECT", "PATCH"}) {
+  for (const char* method : {"PUT", "DELETE", "TRACE", "CONNECT", "PATCH"}) {
     EXPECT_EQ(statusOf(check({}, method)), 405) << method;
   }
   EXPECT_EQ(statusOf(check({}, "BREW")), 501);
   EXPECT_EQ(statusOf(check({}, "post")), 501) << "methods are told apart by case";
+}
+
+TEST(RequestHead, TheRootHasAPageAndNoOtherPath) {
+  const HeaderList headers{{"Host", "localhost"}};
+  for (const char* method : {"GET", "HEAD"}) {
+    EXPECT_EQ(statusOf(checkHead({method, "/", "HTTP/1.1", headers}, kMost)), 200) << method;
+    const auto refusal = checkHead({method, "/cimom", "HTTP/1.1", headers}, kMost);
+    EXPECT_EQ(statusOf(refusal), 405) << method;
+    EXPECT_EQ(refusal->allow, "POST, M-POST, OPTIONS");
+  }
+  EXPECT_EQ(checkHead({"PUT", "/", "HTTP/1.1", headers}, kMost)->allow, "GET, HEAD, POST, M-POST, OPTIONS");
+}
+
+TEST(RequestHead, CapabilitiesNameNoGroupOfOperationsThatIsNotThere) {
+  const HeaderList can = capabilities("/cimom");
+  EXPECT_EQ(*findHeader(can, "77-CIMSupportedFunctionalGroups"),
+            "basic-read, basic-write, instance-manipulation, association-traversal");
+  EXPECT_EQ(*findHeader(can, "Allow"), "POST, M-POST, OPTIONS");
+  EXPECT_EQ(*findHeader(capabilities("/"), "Allow"), "GET, HEAD, POST, M-POST, OPTIONS");
 }
 
 TEST(RequestHead, ContentIsXmlInUtf8) {
