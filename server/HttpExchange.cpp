@@ -1,5 +1,7 @@
 #include "server/HttpExchange.h"
 
+#include <pthread.h>
+
 #include <algorithm>
 #include <utility>
 
@@ -10,6 +12,13 @@ namespace {
 constexpr std::size_t kWorthWaking = std::size_t{32} << 10;
 constexpr std::size_t kWorthCompressing = 1024;
 constexpr std::size_t kBlock = std::size_t{16} << 10;
+
+/// The processor time that a thread has used; nothing where the thread is no more.
+std::optional<HttpExchange::Clock::duration> processorTime(clockid_t clock) {
+  timespec used{};
+  if (::clock_gettime(clock, &used) != 0) return std::nullopt;
+  return std::chrono::seconds(used.tv_sec) + std::chrono::nanoseconds(used.tv_nsec);
+}
 
 /// A description as a header field's value: printable ASCII, the rest percent-encoded (DSP0200 7.3.7).
 std::string fieldText(std::string_view text) {
@@ -43,6 +52,10 @@ void HttpExchange::start(WaitListener& waits) {
   const std::lock_guard lock(mutex_);
   waits_ = &waits;
   started_ = Clock::now();
+  clockid_t clock{};
+  if (::pthread_getcpuclockid(::pthread_self(), &clock) != 0) return;
+  processorClock_ = clock;
+  processorAtStart_ = processorTime(clock).value_or(Clock::duration());
 }
 
 void HttpExchange::begin(int status, const HeaderList& headers) {
@@ -169,6 +182,18 @@ HttpExchange::Clock::duration HttpExchange::waiting() const {
   const std::lock_guard lock(mutex_);
   if (!waitingSince_.has_value()) return {};
   return Clock::now() - *waitingSince_;
+}
+
+bool HttpExchange::hangs() const {
+  constexpr std::chrono::milliseconds kShort{40};
+  constexpr std::chrono::seconds kLong{1};
+  constexpr int kLeastShare = 100;
+  const std::lock_guard lock(mutex_);
+  if (!started_.has_value() || complete_ || waitingSince_.has_value()) return false;
+  const Clock::duration time = Clock::now() - *started_;
+  if (time < kShort || time > kLong) return time > kLong;
+  const auto used = processorClock_.has_value() ? processorTime(*processorClock_) : std::nullopt;
+  return used.has_value() && (*used - processorAtStart_) * kLeastShare < time;
 }
 
 namespace {

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <microhttpd.h>
+#include <time.h>
 
 #include <atomic>
 #include <chrono>
@@ -92,6 +93,10 @@ class HttpExchange final : public ResponseSink {
   /// For how long it has been waiting for the client now.
   Clock::duration waiting() const;
 
+  /// True where the work has run for a while and its thread has used next to no processor time for it, or it has run
+  /// for long: it waits for something that is not its client.
+  bool hangs() const;
+
   /// Gives the work up. Where nothing of a response was sent yet, the late answer that was set is the response, else
   /// `orElse`. Later results are dropped. False: the work was done.
   bool giveUp(const Refusal& orElse);
@@ -139,6 +144,8 @@ class HttpExchange final : public ResponseSink {
   std::string description_;
   LateAnswer lateAnswer_;
   std::optional<Clock::time_point> started_;  ///< moved on by the time spent waiting
+  std::optional<clockid_t> processorClock_;   ///< of the thread that does the work
+  Clock::duration processorAtStart_{};
   std::optional<Clock::time_point> waitingSince_;
 };
 

@@ -274,6 +274,38 @@ TEST(HttpServer, AHandlerThatDoesNotReturnIsGivenUpAndTheOthersGoOn) {
   gate.open();
 }
 
+TEST(HttpServer, HandlersThatHangKeepNoWorkerFromOthers) {
+  HttpLimits limits;
+  limits.workers = 4;
+  Gate gate;
+  std::atomic<int> waiting = 0;
+  {
+    Server server(
+        [&](const HttpRequest& request, ResponseSink& sink) {
+          if (request.body == "hang") {
+            ++waiting;
+            gate.wait();
+          }
+          echo(request, sink);
+        },
+        limits);
+    std::vector<std::unique_ptr<Wire>> hanging;
+    for (int i = 0; i < 40; ++i) {
+      hanging.push_back(std::make_unique<Wire>(server.port()));
+      EXPECT_TRUE(hanging.back()->send(testing::posting("hang")));
+    }
+    for (int i = 0; i < 10; ++i) {
+      Wire other(server.port());
+      EXPECT_TRUE(other.send(testing::posting("go")));
+      EXPECT_EQ(other.receive(seconds(10)).body, "go") << i;
+    }
+    for (int i = 0; i < 1000 && waiting < 40; ++i) std::this_thread::sleep_for(milliseconds(10));
+    EXPECT_EQ(waiting, 40) << "and those that wait for a place get one as well";
+    gate.open();
+    for (const auto& each : hanging) EXPECT_EQ(each->receive().body, "hang");
+  }
+}
+
 TEST(HttpServer, AHandlerThatDoesNotReturnIsAnsweredAsItHasSaid) {
   HttpLimits limits;
   limits.provider = milliseconds(200);

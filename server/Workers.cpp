@@ -2,6 +2,7 @@
 
 #include <pthread.h>
 
+#include <algorithm>
 #include <condition_variable>
 #include <deque>
 #include <exception>
@@ -23,6 +24,7 @@ using Clock = HttpExchange::Clock;
 
 constexpr std::chrono::seconds kIdleThread{10};
 constexpr std::chrono::milliseconds kMayWait{500};
+constexpr std::chrono::milliseconds kLook{20};
 constexpr std::size_t kMostStuck = 64;
 
 Refusal overloaded(std::string why) { return {503, std::move(why), {}}; }
@@ -66,9 +68,13 @@ class Workers::Core : public WaitListener, public std::enable_shared_from_this<C
   bool answer(std::unique_lock<std::mutex>& lock);
   void forget(HttpExchange& exchange);
   bool sleep(std::unique_lock<std::mutex>& lock);
+  void watch(std::unique_lock<std::mutex>& lock);
+  bool needsThread() const;
   Sleeper* nextSleeper();
   void wakeOne();
-  std::ptrdiff_t mostActive() const { return static_cast<std::ptrdiff_t>(limits_.workers); }
+  std::ptrdiff_t countHanging() const;
+  /// How many requests more may run.
+  std::ptrdiff_t places() const { return static_cast<std::ptrdiff_t>(limits_.workers) - active_ + hanging_; }
 
   mutable std::mutex mutex_;
   std::vector<Sleeper*> sleepers_;  ///< the last one went to sleep last, and has the warmest cache
@@ -81,7 +87,9 @@ class Workers::Core : public WaitListener, public std::enable_shared_from_this<C
   std::size_t idle_ = 0;  ///< threads that wait for work
   /// Requests that run and do not wait for their client. Below 0 for the moment in which one that waits is given up.
   std::ptrdiff_t active_ = 0;
-  std::size_t stuck_ = 0;  ///< threads whose request was given up
+  std::ptrdiff_t hanging_ = 0;  ///< of active_, when it was last looked
+  bool isWatched_ = false;      ///< a thread looks for places for the queue
+  std::size_t stuck_ = 0;       ///< threads whose request was given up
   bool stopping_ = false;
 };
 
@@ -97,8 +105,7 @@ std::optional<Refusal> Workers::Core::submit(const std::shared_ptr<HttpExchange>
 
   std::unique_lock lock(mutex_);
   if (stopping_) return overloaded("the server is ending");
-  const bool needsThread = idle_ <= queue_.size();
-  if (needsThread && active_ + std::ssize(queue_) < mostActive() && !startThread() && threads_ == stuck_) {
+  if (needsThread() && !startThread() && threads_ == stuck_) {
     return overloaded("the server cannot start a thread for the request");
   }
   exchange->place = inFlight_.size();
@@ -108,6 +115,13 @@ std::optional<Refusal> Workers::Core::submit(const std::shared_ptr<HttpExchange>
   lock.unlock();
   if (woken != nullptr) woken->release();
   return std::nullopt;
+}
+
+/// Beside the threads for those in the queue that may run, there is one for the next, or to watch while it waits.
+bool Workers::Core::needsThread() const {
+  const std::size_t answering = inFlight_.size() - queue_.size();
+  const auto spare = static_cast<std::ptrdiff_t>(threads_ - stuck_ - answering);
+  return spare <= std::min(std::ssize(queue_), std::max(places(), std::ptrdiff_t{0}));
 }
 
 /// Of the clients that let their responses wait, the one that has done so for longest goes.
@@ -143,8 +157,10 @@ void Workers::Core::run() {
   std::unique_lock lock(mutex_);
   bool goesOn = true;
   while (goesOn) {
-    if (!queue_.empty() && active_ < mostActive()) {
+    if (!queue_.empty() && places() > 0) {
       goesOn = answer(lock);
+    } else if (!queue_.empty() && !isWatched_ && !stopping_) {
+      watch(lock);
     } else if (stopping_ || !sleep(lock)) {
       break;
     }
@@ -168,6 +184,32 @@ bool Workers::Core::sleep(std::unique_lock<std::mutex>& lock) {
   }
   --idle_;
   return woken;
+}
+
+/// Waits a moment for a place for those in the queue. What hangs by then keeps none.
+void Workers::Core::watch(std::unique_lock<std::mutex>& lock) {
+  isWatched_ = true;
+  lock.unlock();
+  std::this_thread::sleep_for(kLook);
+  const std::ptrdiff_t hanging = countHanging();
+  lock.lock();
+  hanging_ = hanging;
+  isWatched_ = false;
+  // This thread takes one request, others take what else may run, and one more watches over the rest.
+  const std::ptrdiff_t others = std::min(std::ssize(queue_), places() + 1) - 1;
+  for (std::ptrdiff_t i = 0; i < others; ++i) {
+    if (Sleeper* const next = nextSleeper()) {
+      next->release();
+    } else if (!needsThread() || !startThread()) {
+      return;
+    }
+  }
+}
+
+/// Takes the locks of the exchanges, so it must not be called under this one's.
+std::ptrdiff_t Workers::Core::countHanging() const {
+  const std::vector<std::shared_ptr<HttpExchange>> all = exchanges();
+  return std::count_if(all.begin(), all.end(), [](const auto& each) { return each->hangs(); });
 }
 
 /// The thread to wake: it stays asleep until it is.
@@ -256,8 +298,10 @@ std::size_t Workers::Core::inFlight() const {
 void Workers::Core::sweep() {
   std::chrono::milliseconds most;
   {
+    const std::ptrdiff_t hanging = countHanging();
     const std::lock_guard lock(mutex_);
     most = limits_.provider;
+    hanging_ = hanging;
   }
   for (const auto& each : exchanges()) {
     const auto worked = each->worked();
@@ -283,6 +327,7 @@ void Workers::Core::giveUp(const std::shared_ptr<HttpExchange>& exchange, const 
   }
   --active_;
   ++stuck_;
+  if (hanging_ > 0) --hanging_;
   if (queue_.empty()) return;
   if (idle_ == 0) startThread();
   wakeOne();

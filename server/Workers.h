@@ -11,9 +11,11 @@
 
 // The threads that answer requests. They are made when they are needed and end when they are not.
 //
-// A request that waits for its client to take what is ready does not count as running, and one whose provider does not
-// return within its limit is given up: its client gets an answer, another thread takes the place of its own, and its
-// thread ends whenever the provider lets it. So neither slow clients nor hanging providers keep others from a worker.
+// A request that waits for its client to take what is ready does not count as running. Neither does one that hangs (see
+// HttpExchange::hangs): it keeps its thread, and others run beside it, up to the limit on requests. One whose provider
+// does not return within its limit is given up: its client gets an answer, another thread takes the place of its own,
+// and its thread ends whenever the provider lets it. So neither slow clients nor hanging providers keep others from a
+// worker.
 
 namespace zorva::server {
 
