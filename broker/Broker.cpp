@@ -91,7 +91,8 @@ FarEnd farEndOf(const AssociationFilter& filter) noexcept {
   return {filter.associationClass, filter.resultClass, filter.role, filter.resultRole};
 }
 
-/// The path of an operation that has a status of its own for a class that is not there (DSP0200 5.3.2.14 to .17, 5.4.1).
+/// The path of an operation that has a status of its own for a class that is not there (DSP0200 5.3.2.14 to
+/// .17, 5.4.1).
 Status makeSource(Arena& arena, const ObjectPath& path, int unknownClass, PathObject*& object) {
   Status status = makePath(arena, path, true, object);
   if (status.rc == CMPI_RC_ERR_INVALID_CLASS) status.rc = unknownClass;
@@ -307,6 +308,8 @@ Status Broker::invokeMethod(const ObjectPath& path, std::string_view method, con
     return status;
   });
 }
+
+std::vector<std::string> Broker::openLibraries() { return core_->loader().openAll(); }
 
 const schema::ClassRepository& Broker::classes() const noexcept { return core_->classes().repository(); }
 

@@ -149,9 +149,9 @@ class Broker {
 
   /// The objects at the far ends of the associations of `path`. Every concrete served association that fits the filter
   /// is asked under its own name; what comes back is checked against `resultClass`. A class that does not exist, of
-  /// `path` or in the filter, is CIM_ERR_INVALID_PARAMETER. Where several associations are asked, one that answers "not supported" or
-  /// whose library cannot be loaded is passed over (the latter with a line in the log) unless all are so; after any
-  /// other failure the rest are still asked, and the first failure is the status.
+  /// `path` or in the filter, is CIM_ERR_INVALID_PARAMETER. Where several associations are asked, one that answers "not
+  /// supported" or whose library cannot be loaded is passed over (the latter with a line in the log) unless all are so;
+  /// after any other failure the rest are still asked, and the first failure is the status.
   Status associators(const ObjectPath& path, const AssociationFilter& filter, const Selection& selection,
                      const InstanceSink& sink, const Caller& caller = {});
   Status associatorNames(const ObjectPath& path, const AssociationFilter& filter, const PathSink& sink,
@@ -169,6 +169,10 @@ class Broker {
   /// static.
   Status invokeMethod(const ObjectPath& path, std::string_view method, const std::vector<NamedValue>& input,
                       MethodResult& result, const Caller& caller = {});
+
+  /// Opens the provider libraries now, which requests do otherwise when they first need them. A sentence for each one
+  /// that cannot be opened.
+  std::vector<std::string> openLibraries();
 
   const schema::ClassRepository& classes() const noexcept;
   const ProviderRegistry& registry() const noexcept;

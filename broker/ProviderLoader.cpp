@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <exception>
+#include <set>
 
 #include "broker/BrokerCore.h"
 #include "broker/Data.h"
@@ -187,6 +188,19 @@ const CMPIAssociationMI* ProviderLoader::associationMi(const ProviderEntry& entr
 
 const CMPIMethodMI* ProviderLoader::methodMi(const ProviderEntry& entry, Status& status) {
   return find(entry, &Provider::method, MethodMi, status);
+}
+
+std::vector<std::string> ProviderLoader::openAll() {
+  const std::lock_guard lock(mutex_);
+  std::set<std::string> names;
+  for (const auto& provider : providers_) names.insert(provider->library);
+  names.erase("");  // providers that are part of the program
+  std::vector<std::string> problems;
+  for (const std::string& name : names) {
+    Status status;
+    if (open(name, status) == nullptr) problems.push_back(std::move(status.message));
+  }
+  return problems;
 }
 
 }  // namespace zorva::broker

@@ -37,6 +37,9 @@ class ProviderLoader {
   const CMPIAssociationMI* associationMi(const ProviderEntry& entry, Status& status);
   const CMPIMethodMI* methodMi(const ProviderEntry& entry, Status& status);
 
+  /// Opens every library that the registry names, and says of each one that cannot be opened why.
+  std::vector<std::string> openAll();
+
  private:
   struct Library;
   /// One prefix in one library; several entries of the registry may share it.

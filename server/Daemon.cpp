@@ -14,7 +14,9 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <filesystem>
 #include <stdexcept>
+#include <system_error>
 #include <utility>
 #include <vector>
 
@@ -260,13 +262,47 @@ int Daemon::timeout() const {
   return requestsTrimmed_ == 0 ? -1 : kQuietMilliseconds;
 }
 
+/// Opens the log where it goes to. A file that was not there does not stay: another user may be the one who serves.
+void tryLog(const Config& config) {
+  const std::string target = config.logTarget.value_or(zorvagent::currentConfig().logTarget);
+  const bool isFile = target.find('/') != std::string::npos;
+  const bool isNew = isFile && ::access(target.c_str(), F_OK) != 0;
+  applyLog(config);
+  if (!isNew) return;
+  zorvagent::setLogTarget(zorvagent::LogStream::Log, "off");
+  ::unlink(target.c_str());
+}
+
+void tryProviders(const Config& config, const MakeBroker& makeBroker, std::vector<std::string>& problems) {
+  const std::string& directory = config.providerDirectory;
+  std::error_code error;
+  if (!directory.empty()) std::filesystem::directory_iterator(directory, error);
+  if (error) {
+    problems.push_back("agent.provider_dir: " + directory + ": " + error.message());
+    return;
+  }
+  for (std::string& each : makeBroker(config)->openLibraries()) problems.push_back(std::move(each));
+}
+
+/// Reads and opens what a start would, and says all that is wrong.
+int check(const Config& config, const MakeBroker& makeBroker) {
+  zorvagent::loadConfig(config.agentConfig);
+  std::vector<std::string> problems;
+  try {
+    tryLog(config);
+  } catch (const std::exception& error) {
+    problems.push_back(std::string("log.target: ") + error.what());
+  }
+  tryProviders(config, makeBroker, problems);
+  for (const std::string& each : problems) tellError(each);
+  if (!problems.empty()) return kCannotServe;
+  std::printf("%s: good\n", config.file.empty() ? "the built-in configuration" : config.file.c_str());
+  return kServed;
+}
+
 int serve(const CommandLine& commandLine, const MakeBroker& makeBroker) {
   Config config = configOf(commandLine);
-  if (commandLine.checkConfig) {
-    if (!config.agentConfig.empty()) zorvagent::readConfig(config.agentConfig);
-    std::printf("%s: good\n", config.file.empty() ? "the built-in configuration" : config.file.c_str());
-    return kServed;
-  }
+  if (commandLine.checkConfig) return check(config, makeBroker);
   // A few heaps for all threads: more would hold memory for each of them.
   ::mallopt(M_ARENA_MAX, 2);
   zorvagent::loadConfig(config.agentConfig);

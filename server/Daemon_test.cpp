@@ -252,6 +252,31 @@ TEST(DaemonProcess, ChecksAConfiguration) {
   EXPECT_THAT(wrong.err, HasSubstr("bad.toml:3: limits.body: is not a known key"));
 }
 
+TEST(DaemonProcess, CheckingAConfigurationOpensTheLogAndTheProviders) {
+  const zorvagent::testing::TemporaryDirectory directory;
+  const std::string bad =
+      directory.write("bad.toml", "[agent]\nprovider_dir = \"none\"\n[log]\ntarget = \"no/such/directory/log\"\n");
+  const auto wrong = TestDaemon::run({"--config", bad, "--check-config"});
+  EXPECT_EQ(wrong.exitCode, 1);
+  EXPECT_THAT(wrong.out, ::testing::IsEmpty());
+  EXPECT_THAT(wrong.err, HasSubstr("log.target: " + (directory / "no/such/directory/log") + ": cannot be opened"));
+  EXPECT_THAT(wrong.err, HasSubstr("agent.provider_dir: " + (directory / "none") + ": No such file or directory"));
+
+  directory.write("empty/keep", "");
+  const std::string empty = directory.write("empty.toml", "[agent]\nprovider_dir = \"empty\"\n");
+  const auto lacking = TestDaemon::run({"--config", empty, "--check-config"});
+  EXPECT_EQ(lacking.exitCode, 1);
+  EXPECT_THAT(lacking.err, HasSubstr("there is no provider library " + (directory / "empty/libzorvadnsclient")));
+  EXPECT_THAT(lacking.err, HasSubstr("there is no provider library " + (directory / "empty/libzorvahost")));
+}
+
+TEST(DaemonProcess, CheckingAConfigurationLeavesNoLogBehind) {
+  const zorvagent::testing::TemporaryDirectory directory;
+  const std::string good = directory.write("good.toml", "[log]\ntarget = \"log\"\n");
+  EXPECT_EQ(TestDaemon::run({"--config", good, "--check-config"}).exitCode, 0);
+  EXPECT_NE(::access((directory / "log").c_str(), F_OK), 0);
+}
+
 TEST(DaemonProcess, SaysWhatIsWrongWithAPortThatIsTaken) {
   const TestDaemon daemon;
   const auto outcome = TestDaemon::run({"--listen", "127.0.0.1", "--port", std::to_string(daemon.port())});
