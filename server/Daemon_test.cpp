@@ -9,6 +9,7 @@
 #include <sys/un.h>
 #include <unistd.h>
 
+#include <atomic>
 #include <chrono>
 #include <cstring>
 #include <fstream>
@@ -227,6 +228,57 @@ TEST(HostileRequests, AFloodOfThemDoesNotFillTheLog) {
   }
   const std::string log = daemon.log();
   EXPECT_LT(std::count(log.begin(), log.end(), '\n'), 200);
+}
+
+/// Requests of nearly 4 MB in which one element repeats.
+std::vector<std::string> largeRequests() {
+  const std::string head =
+      R"(<CIM CIMVERSION="2.0" DTDVERSION="2.0"><MESSAGE ID="1" PROTOCOLVERSION="1.0"><SIMPLEREQ>)"
+      R"(<IMETHODCALL NAME="GetClass"><LOCALNAMESPACEPATH><NAMESPACE NAME="interop"/></LOCALNAMESPACEPATH>)";
+  const std::string tail = "</IMETHODCALL></SIMPLEREQ></MESSAGE></CIM>";
+  const auto request = [&](const std::string& before, const char* begin, const char* end, const std::string& after) {
+    std::string body = head + before;
+    for (int i = 1'000'000; i < 1'140'000 && body.size() < 3'900'000; ++i) body += begin + std::to_string(i) + end;
+    return testing::posting(body + after + tail,
+                            "CIMOperation: MethodCall\r\nCIMMethod: GetClass\r\nCIMObject: interop\r\n");
+  };
+  const std::string parameter = "<IPARAMVALUE NAME=\"P\">";
+  return {
+      request("", "<IPARAMVALUE NAME=\"P", "\"/>", ""),
+      request(parameter + "<INSTANCENAME CLASSNAME=\"C\">", "<KEYBINDING NAME=\"K", "\"><KEYVALUE/></KEYBINDING>",
+              "</INSTANCENAME></IPARAMVALUE>"),
+      request(parameter + "<INSTANCE CLASSNAME=\"C\">", "<PROPERTY NAME=\"P", "\" TYPE=\"string\"/>",
+              "</INSTANCE></IPARAMVALUE>"),
+      request(parameter + "<VALUE>", "a<!--", "-->", "</VALUE></IPARAMVALUE>"),
+  };
+}
+
+/// Lets some clients send large requests, and counts the small ones that are answered meanwhile.
+int answersBeside(int port, const std::vector<std::string>& large) {
+  std::atomic<std::size_t> running = large.size();
+  std::vector<std::thread> clients;
+  for (const std::string& request : large) {
+    clients.emplace_back([&] {
+      Wire wire(port);
+      wire.send(request);
+      EXPECT_NE(wire.receive(seconds(60)).status, 0);
+      --running;
+    });
+  }
+  int answers = 0;
+  while (running > 0) {
+    if (endpoints(port).find("eth0") != std::string::npos) ++answers;
+  }
+  for (std::thread& client : clients) client.join();
+  return answers;
+}
+
+TEST(HostileRequests, LargeOnesHoldUpNobodyElse) {
+  const TestDaemon daemon;
+  const std::vector<std::string> large = largeRequests();
+  int answers = 0;
+  for (int i = 0; i < 5; ++i) answers += answersBeside(daemon.port(), large);
+  EXPECT_GT(answers, 20) << "other clients go on while " << 5 * large.size() << " large requests are read";
 }
 
 // ---- The process ----

@@ -1,7 +1,9 @@
 #include "server/Service.h"
 
 #include <algorithm>
+#include <chrono>
 #include <exception>
+#include <semaphore>
 
 #include "broker/PathText.h"
 #include "cimxml/RequestReader.h"
@@ -18,6 +20,10 @@ namespace {
 
 using broker::LogLevel;
 using broker::Status;
+
+// Bodies above this size are read one at a time: reading one takes a processor, which others need as well.
+constexpr std::size_t kLargeBody = 128U << 10U;
+constexpr std::chrono::milliseconds kBetweenLooks{100};
 
 // A buffer that a response of large objects has made larger than this is not kept for the next request.
 constexpr std::size_t kMostKept = 256U << 10U;
@@ -52,6 +58,25 @@ PullLimits pullLimits(const ServiceOptions& options) {
   limits.maxBytes = options.maxPullBytes;
   return limits;
 }
+
+/// The turn to read a large body; none is needed for a small one.
+class Turn {
+ public:
+  Turn(std::binary_semaphore& turns, const HttpRequest& http, const ResponseSink& sink)
+      : turns_(http.body.size() > kLargeBody ? &turns : nullptr) {
+    while (turns_ != nullptr && !turns_->try_acquire_for(kBetweenLooks)) {
+      if (!sink.isWanted()) throw ClientGone("nobody waits for the response");
+    }
+  }
+  ~Turn() {
+    if (turns_ != nullptr) turns_->release();
+  }
+  Turn(const Turn&) = delete;
+  Turn& operator=(const Turn&) = delete;
+
+ private:
+  std::binary_semaphore* const turns_;
+};
 
 /// What an answer repeats of its request.
 struct Outline {
@@ -130,13 +155,7 @@ class ServiceCore {
     CimHeaders headers;
     cimxml::CimRequest request;
     std::optional<HttpRefusal> refusal = readHeaders(http, headers);
-    if (!refusal) {
-      cimxml::ReaderLimits limits;
-      limits.xml.depth = options_.maxDepth;
-      limits.xml.isOver = [&sink] { return !sink.isWanted(); };
-      limits.calls = options_.maxOperations;
-      if (const auto error = cimxml::readRequest(http.body, limits, request)) refusal = refusalOf(*error);
-    }
+    if (!refusal) refusal = read(http, sink, request);
     if (!refusal) refusal = checkHeaders(headers, request, broker_);
     if (refusal) return refuse(*refusal, sink);
     caller.acceptLanguage = headers.acceptLanguage;
@@ -157,6 +176,16 @@ class ServiceCore {
   }
 
  private:
+  std::optional<HttpRefusal> read(const HttpRequest& http, const ResponseSink& sink, cimxml::CimRequest& request) {
+    cimxml::ReaderLimits limits;
+    limits.xml.depth = options_.maxDepth;
+    limits.xml.isOver = [&sink] { return !sink.isWanted(); };
+    limits.calls = options_.maxOperations;
+    const Turn turn(largeReads_, http, sink);
+    if (const auto error = cimxml::readRequest(http.body, limits, request)) return refusalOf(*error);
+    return std::nullopt;
+  }
+
   void refuse(const HttpRefusal& refusal, ResponseSink& sink) const {
     log(LogLevel::Warning, "a request was refused with HTTP status " + std::to_string(refusal.status) +
                                (refusal.cimError.empty() ? "" : ", " + refusal.cimError) + ": " + refusal.message);
@@ -218,6 +247,7 @@ class ServiceCore {
   const ServiceOptions options_;
   const ServiceHost host_;
   PullTable pulls_;
+  std::binary_semaphore largeReads_{1};
 };
 
 Service::Service(broker::Broker& broker, ServiceOptions options)

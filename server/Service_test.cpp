@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include <atomic>
+#include <semaphore>
 #include <thread>
 
 #include "server/ServiceHarness.h"
@@ -279,6 +280,39 @@ TEST(Service, DoesNotReadOnWhereNobodyWaitsAnyMore) {
   EXPECT_EQ(sink.looks, 4);
   EXPECT_EQ(sink.status, 503);
   EXPECT_FALSE(sink.late) << "what was not read has no late answer but that of HTTP";
+}
+
+/// A sink that stops its request at the first look, until it may go on.
+class StoppingSink : public CollectingSink {
+ public:
+  bool isWanted() const override {
+    reached.release();
+    mayGoOn.acquire();
+    mayGoOn.release();
+    return true;
+  }
+
+  mutable std::counting_semaphore<> reached{0};  ///< one more for each look
+  mutable std::binary_semaphore mayGoOn{0};
+};
+
+TEST(Service, ReadsOneLargeBodyAtATimeAndSmallOnesBesideIt) {
+  TestService service;
+  std::string extra;
+  for (int i = 0; i < 50'000; ++i) extra += "<EXTRA/>";
+  const HttpRequest large = testing::request("EnumerateInstanceNames", kThings + extra);
+  StoppingSink first;
+  std::thread reader([&] { service.service().handle(large, first); });
+  first.reached.acquire();
+  ImpatientSink second;
+  second.patience = 0;
+  EXPECT_THROW(service.service().handle(large, second), ClientGone);
+  EXPECT_EQ(second.status, 0) << "its turn did not come";
+  EXPECT_EQ(service.ask(good()).status, 200);
+  first.mayGoOn.release();
+  reader.join();
+  EXPECT_EQ(first.status, 200);
+  EXPECT_EQ(service.ask(large).status, 200);
 }
 
 }  // namespace
