@@ -7,8 +7,12 @@ Throughput is a ratio: requests per second of the server over those of a ceiling
 the same HTTP library in the same threading mode: event threads that hand each request to another thread and get it
 back. Beside it stands the ratio to a ceiling whose event threads answer by themselves, which a server of providers
 cannot do: one that hangs would hang all connections of its thread. All are measured by wrk in turns, and the best turn
-of each counts: what else a machine does only takes away, and takes most from who has several threads. NAME picks the
-figures: few, many, start, memory, endpoints. Exits 1 where a figure falls short.
+of each counts: what else a machine does only takes away, and takes most from who has several threads. Each request
+asks for all properties.
+
+"hostile" is how long a client waits while others send requests of 3.9 MB of one element, repeated.
+
+NAME picks the figures: few, many, start, memory, endpoints, hostile. Exits 1 where a figure falls short.
 """
 
 import argparse
@@ -24,6 +28,8 @@ import subprocess
 import sys
 import tempfile
 import time
+
+import hostile as sending
 
 HERE = os.path.dirname(os.path.abspath(__file__))
 THREADS = 2
@@ -102,6 +108,7 @@ def request(class_name):
             f'<MESSAGE ID="1" PROTOCOLVERSION="1.0"><SIMPLEREQ><IMETHODCALL NAME="EnumerateInstances">'
             f'<LOCALNAMESPACEPATH><NAMESPACE NAME="root"/><NAMESPACE NAME="cimv2"/></LOCALNAMESPACEPATH>'
             f'<IPARAMVALUE NAME="ClassName"><CLASSNAME NAME="{class_name}"/></IPARAMVALUE>'
+            f'<IPARAMVALUE NAME="LocalOnly"><VALUE>FALSE</VALUE></IPARAMVALUE>'
             f'</IMETHODCALL></SIMPLEREQ></MESSAGE></CIM>')
 
 
@@ -235,10 +242,24 @@ def memory(build):
                    f"{after:.1f} MB, {peak:.1f} at most")]
 
 
+def hostile(build):
+    """What a client waits while others send large requests, of each kind alone and of all kinds together."""
+    figures = []
+    kinds = sending.bodies()
+    with server(build, "zorvacimd") as (_, port):
+        cases = [("nobody", [], 0)] + [(f"1 of {name}", [body], 1) for name, body in kinds.items()]
+        for name, some, attackers in cases + [("4 of all kinds", list(kinds.values()), 4)]:
+            times, count = sending.latencies_beside(port, some, attackers, 3)
+            figures.append(Figure(f"beside {name}: p99, ms", times[int(len(times) * 0.99)],
+                                  50 if attackers else None, False,
+                                  f"p50 {statistics.median(times):.1f} ms, {len(times)} requests beside {count}"))
+    return figures
+
+
 def main():
     parser = argparse.ArgumentParser(description=__doc__, formatter_class=argparse.RawDescriptionHelpFormatter)
     parser.add_argument("--build", default="build/bench", help="the build folder (default: %(default)s)")
-    parser.add_argument("names", nargs="*", metavar="NAME", help="only: few, many, endpoints, start, memory")
+    parser.add_argument("names", nargs="*", metavar="NAME", help="only: few, many, endpoints, start, memory, hostile")
     arguments = parser.parse_args()
     build = os.path.abspath(arguments.build)
     parts = {
@@ -247,6 +268,7 @@ def main():
         "start": lambda: start_time(build),
         "memory": lambda: memory(build),
         "endpoints": lambda: endpoints(build),
+        "hostile": lambda: hostile(build),
     }
     wanted = [name for name in arguments.names if name != "server"] or list(parts)
     if not set(wanted) <= set(parts):

@@ -18,6 +18,7 @@ function init(arguments)
     .. '<MESSAGE ID="1" PROTOCOLVERSION="1.0"><SIMPLEREQ><IMETHODCALL NAME="EnumerateInstances">'
     .. "<LOCALNAMESPACEPATH>" .. names .. "</LOCALNAMESPACEPATH>"
     .. '<IPARAMVALUE NAME="ClassName"><CLASSNAME NAME="' .. class .. '"/></IPARAMVALUE>'
+    .. '<IPARAMVALUE NAME="LocalOnly"><VALUE>FALSE</VALUE></IPARAMVALUE>'
     .. "</IMETHODCALL></SIMPLEREQ></MESSAGE></CIM>"
 end
 
