@@ -94,7 +94,8 @@ Status checkWritable(const ModificationRequest& request, const Modification& mod
     names += (names.empty() ? "" : ", ") + property->declared->name;
   }
   if (names.empty()) return {};
-  return {CMPI_RC_ERR_NOT_SUPPORTED, "of " + request.given.info->name() + " cannot be changed: " + names};
+  return {CMPI_RC_ERR_NOT_SUPPORTED,
+          "these properties of " + request.given.info->name() + " cannot be changed: " + names};
 }
 
 }  // namespace

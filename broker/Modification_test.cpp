@@ -110,8 +110,9 @@ TEST_F(ModificationTest, TellsWhatItChangesInTheTypesOfTheSchema) {
 
 TEST_F(ModificationTest, RefusesAnotherValueForWhatCannotBeChanged) {
   expectRefused(modify({size(9), {"Tiny", Value::text("1")}, {"good", Value::boolean(true)}}), 7,
-                "of T_Thing cannot be changed: Good, Tiny");
-  expectRefused(modify({{"Tiny", Value::text("1")}}, {{"tiny"}}), 7, "of T_Thing cannot be changed: Tiny");
+                "these properties of T_Thing cannot be changed: Good, Tiny");
+  expectRefused(modify({{"Tiny", Value::text("1")}}, {{"tiny"}}), 7,
+                "these properties of T_Thing cannot be changed: Tiny");
   expectHanded(modify({size(9), {"Tiny", Value::text("1")}}, {{"size"}}), "[Size] Size 9");
   expectHanded(modify({size(8), {"Tiny", Value::null(schema::Type::Uint8)}}), "all Size 8");
 }

@@ -47,12 +47,12 @@ constexpr BuiltIn kBuiltIn[] = {
     {"ZORVA_IPAssignmentSettingData", "HostIPAssignmentSettingDataProvider", kHostLibrary, InstanceMi},
 };
 
-/// ProviderEntry::keeps of the classes that can be modified. The setting data's provider empties a ConfigurationName
-/// that is missing.
+/// ProviderEntry::keeps of the classes that can be modified. Of the setting data's providers, one empties a
+/// ConfigurationName that is missing, the other logs an error.
 std::vector<std::string> keptBy(std::string_view className) {
   if (className == "ZORVA_DNSProtocolEndPoint") return {"DNSSuffixesToAppend", "DomainName", "Hostname"};
   if (className == "ZORVA_DNSSettingData") return {"RequestedHostname", "DomainName", "DNSServerAddresses"};
-  if (className == "ZORVA_DNSGeneralSettingData") return {"DNSSuffixesToAppend", "ConfigurationName"};
+  if (className == "ZORVA_DNSGeneralSettingData") return {"DNSSuffixesToAppend"};
   return {};
 }
 

@@ -214,9 +214,11 @@ TEST_F(ZorvaClasses, MarkWhatModifyInstanceChanges) {
       {"ZORVA_DNSGeneralSettingData", {"DNSSuffixesToAppend", "ConfigurationName"}},
   };
   for (const auto& [name, properties] : rows) {
-    for (const char* property : properties) {
-      EXPECT_TRUE(hasQualifier(get(name).findProperty(property)->qualifiers, "Write")) << name << "." << property;
+    std::vector<std::string> writable;
+    for (const ClassProperty* property : get(name).properties()) {
+      if (hasQualifier(property->qualifiers, "Write")) writable.push_back(property->name);
     }
+    EXPECT_THAT(writable, ::testing::UnorderedElementsAreArray(properties)) << name;
   }
 }
 

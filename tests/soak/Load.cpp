@@ -182,7 +182,7 @@ void Client::change() {
   if (className != kClasses[0]) set("ConfigurationName", Value::text("configuration"));
   const Status status = load_.broker.modifyInstance(instance, std::nullopt);
   // The interface of a setting may be gone by now.
-  checkStatus(status, std::string("ModifyInstance of ") + className, {kFailed});
+  checkStatus(status, std::string("ModifyInstance of ") + className, {kFailed, kNotFound});
 }
 
 void Client::invoke() {
