@@ -62,9 +62,12 @@ class BrokerTest : public ::testing::Test {
     return found;
   }
 
+  /// Of the properties that have a value.
   static std::vector<std::string> propertyNames(const Instance& instance) {
     std::vector<std::string> found;
-    for (const Property& property : instance.properties) found.push_back(property.name);
+    for (const Property& property : instance.properties) {
+      if (!property.value.isNull) found.push_back(property.name);
+    }
     return found;
   }
 
@@ -125,6 +128,32 @@ TEST_F(BrokerTest, EnumeratesInstancesWithEachResultOnce) {
   EXPECT_EQ(*found[0].property("SIZE"), Value::unsignedNumber(7, schema::Type::Uint16));
   ASSERT_NE(found[0].properties[0].declaration, nullptr);
   EXPECT_TRUE(found[0].properties[0].declaration->isKey);
+}
+
+TEST_F(BrokerTest, AnInstanceHasEveryPropertyOfItsClass) {
+  const std::vector<Instance> found = instances("T_Thing");
+  ASSERT_EQ(found.size(), 3U);
+  for (const Instance& instance : found) {
+    ASSERT_NE(instance.declaration, nullptr);
+    EXPECT_EQ(instance.properties.size(), instance.declaration->properties().size());
+    for (const schema::ClassProperty* declared : instance.declaration->properties()) {
+      const Value* value = instance.property(declared->name);
+      ASSERT_NE(value, nullptr) << declared->name;
+      EXPECT_EQ(value->type, declared->type) << declared->name;
+      EXPECT_EQ(value->isArray, declared->isArray) << declared->name;
+    }
+    EXPECT_EQ(*instance.property("Numbers"), Value::null(schema::Type::Uint16, true));
+    EXPECT_TRUE(instance.property("Tiny")->isNull) << "the default of the class is no fact";
+  }
+}
+
+TEST_F(BrokerTest, APropertyListLeavesOutAlsoWhatHasNoValue) {
+  Selection selection;
+  selection.propertyList = {"Tiny", "size"};
+  const Instance instance = get("T_Thing.Name=\"a\"", selection);
+  ASSERT_EQ(instance.properties.size(), 2U);
+  EXPECT_EQ(instance.properties[0].name, "Size");
+  EXPECT_EQ(instance.properties[1], (Property{"Tiny", Value::null(schema::Type::Uint8)}));
 }
 
 TEST_F(BrokerTest, EnumeratesTheServedClassesBelowAnAbstractOne) {

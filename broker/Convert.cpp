@@ -141,6 +141,23 @@ void fillInstancePath(const InstanceObject& object, ObjectPath& path) {
 
 }  // namespace
 
+namespace {
+
+/// Makes the property at `place` null. The same property often was there in the instance before: then that is all.
+void fillNull(const PropertyInfo& property, std::size_t place, Instance& instance) {
+  if (place == instance.properties.size()) instance.properties.emplace_back();
+  Property& filled = instance.properties[place];
+  if (filled.declaration != property.declared) {
+    filled.name.assign(property.name->view());
+    filled.declaration = property.declared;
+  } else if (filled.value.isNull) {
+    return;
+  }
+  fillValue(nullData(property.type), filled.value);
+}
+
+}  // namespace
+
 void fillInstance(const InstanceObject& object, const PropertyMask& wanted, Instance& instance) {
   fillInstancePath(object, instance.path);
   instance.declaration = &object.info->declared();
@@ -153,6 +170,9 @@ void fillInstance(const InstanceObject& object, const PropertyMask& wanted, Inst
     property.name.assign(slot.property->name->view());
     property.declaration = slot.property->declared;
     fillValue(slot.data, property.value);
+  }
+  for (const PropertyInfo& property : object.info->properties()) {
+    if (wanted.has(property) && object.find(property) == nullptr) fillNull(property, count++, instance);
   }
   instance.properties.resize(count);
 }

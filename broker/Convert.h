@@ -23,6 +23,8 @@ struct PropertyMask {
 };
 
 void fillPath(const PathObject& object, ObjectPath& path);
+/// The properties that are set, in the order in which they were set, then all others of the class without value: the
+/// defaults of the schema are no facts of the host.
 void fillInstance(const InstanceObject& object, const PropertyMask& wanted, Instance& instance);
 void fillValue(const CMPIData& data, Value& value);
 

@@ -31,7 +31,7 @@ Qualifier Static : boolean = false, Scope(property, method), Flavor(DisableOverr
   [Write, Values {"small", "large"}] uint16 Size;
   [Write] string Labels[];
   boolean Good; char16 Letter; datetime Since;
-  uint8 Tiny; sint8 STiny; sint16 SSmall; uint32 Wide; sint32 SWide; uint64 Huge; sint64 SHuge;
+  uint8 Tiny = 5; sint8 STiny; sint16 SSmall; uint32 Wide; sint32 SWide; uint64 Huge; sint64 SHuge;
   real32 Rough; real64 Ratio;
   uint16 Numbers[];
   [Write, EmbeddedInstance("T_Thing")] string Inner;

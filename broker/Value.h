@@ -108,7 +108,8 @@ struct Property {
   bool operator==(const Property& other) const { return name == other.name && value == other.value; }
 };
 
-/// An instance: those of its properties that were set, in the order in which they were set.
+/// An instance. What the broker gives has every property of its class, save those that a property list leaves out:
+/// first those that were set, in the order in which they were set, then the others as null.
 struct Instance {
   ObjectPath path;  ///< its class and, on what the broker gives, its name
   std::vector<Property> properties;

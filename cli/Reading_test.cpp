@@ -206,7 +206,21 @@ TEST(Enumerate, GivesOnlyThePropertiesThatAreWanted) {
 
 TEST(Enumerate, KeepsNumbersBesideTheirWordsInATable) {
   EXPECT_THAT(shown(TestHost(), {"ei", "ZORVA_DNSProtocolEndPoint"}),
-              HasSubstr("EnabledState             2 (Enabled)\n"));
+              testing::ContainsRegex("  EnabledState +2 \\(Enabled\\)\n"));
+}
+
+TEST(Enumerate, ShowsThePropertiesThatHaveNoValue) {
+  const TestHost host({TestHost::port("eth0")});
+  const Words words{"ei", "ZORVA_DNSProtocolEndPoint", "-o"};
+  const auto as = [&](const char* format) {
+    Words all = words;
+    all.emplace_back(format);
+    return shown(host, all);
+  };
+  EXPECT_THAT(as("table"), testing::ContainsRegex("  InstallDate +-\n"));
+  EXPECT_TRUE(json::parse(as("json"))[0]["properties"].at("InstallDate").is_null());
+  EXPECT_THAT(as("mof"), HasSubstr("InstallDate = null;"));
+  EXPECT_THAT(as("xml"), HasSubstr("<PROPERTY NAME=\"InstallDate\" TYPE=\"datetime\"></PROPERTY>"));
 }
 
 TEST(Enumerate, SaysWhichClassesAreLikeOneThatIsNot) {

@@ -25,7 +25,7 @@ class TableWriter : public ResultWriter {
     write(styled(printable(shortPathText(instance.path)), Style::Heading, layout_) + "\n");
     Table table({}, 2);
     for (const broker::Property& property : instance.properties) {
-      table.add({property.name, valueText(property.value, property.declaration)});
+      table.add({property.name, property.value.isNull ? "-" : valueText(property.value, property.declaration)});
     }
     write(table.text(layout_));
   }
