@@ -162,7 +162,7 @@ Status Broker::createInstance(const Instance& instance, ObjectPath& created, con
 }
 
 Status Broker::modifyInstance(const Instance& instance, const std::optional<std::vector<std::string>>& propertyList,
-                              const Caller& caller, std::vector<Property>* changes) {
+                              const Caller& caller, ModificationEffect* effect) {
   return inRequest(*core_, caller, 0, [&](Request& request) {
     PathObject* name = nullptr;
     InstanceObject* object = nullptr;
@@ -174,7 +174,11 @@ Status Broker::modifyInstance(const Instance& instance, const std::optional<std:
     if (!status.ok()) return status;
     Shape shape;
     shape.properties = viewsOf(propertyList);
-    status = request.modify(*name, *object, shape, changes);
+    status = request.modify(*name, *object, shape, effect != nullptr ? &effect->changes : nullptr);
+    if (status.ok() && effect != nullptr && !effect->changes.empty()) {
+      OneTaker taker(&effect->now, nullptr);
+      effect->reading = request.get(*name, Shape(), taker);
+    }
     return claim == nullptr ? status : claim->finish(std::move(status));
   });
 }

@@ -107,6 +107,13 @@ struct MethodResult {
   std::vector<NamedValue> output;  ///< in the order in which the provider set them
 };
 
+/// What a modification was to change, and what came of it: providers may say success and have stored nothing.
+struct ModificationEffect {
+  std::vector<Property> changes;  ///< what the provider was asked to change, in the types that the schema declares
+  Status reading;                 ///< of reading the instance again, under the same claim; only after a success
+  Instance now;                   ///< where that was a success, and there were changes
+};
+
 class Broker {
  public:
   /// `classes` are those of every namespace of the registry.
@@ -138,12 +145,11 @@ class Broker {
   /// instance is read first: what the client does not name, or names with the value that it has, stays as it is, and
   /// where that is all the provider is not called. Before anything is written, these are refused: a listed name that
   /// the class lacks, and a key with another value than in the path (CIM_ERR_INVALID_PARAMETER); another value for a
-  /// property without the qualifier Write (CIM_ERR_NOT_SUPPORTED). `changes`, where it is not null, gets the properties
-  /// that the provider was asked to change, in the types that the schema declares.
-  /// A control character other than tab in a text, here and in createInstance and invokeMethod, is
+  /// property without the qualifier Write (CIM_ERR_NOT_SUPPORTED). `effect`, where it is not null, gets what came of
+  /// it. A control character other than tab in a text, here and in createInstance and invokeMethod, is
   /// CIM_ERR_INVALID_PARAMETER.
   Status modifyInstance(const Instance& instance, const std::optional<std::vector<std::string>>& propertyList,
-                        const Caller& caller = {}, std::vector<Property>* changes = nullptr);
+                        const Caller& caller = {}, ModificationEffect* effect = nullptr);
 
   Status deleteInstance(const ObjectPath& path, const Caller& caller = {});
 

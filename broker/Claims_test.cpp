@@ -58,7 +58,7 @@ class ClaimsTest : public ::testing::Test {
 
   Status change() {
     Instance instance;
-    EXPECT_FALSE(parsePathText("T_Thing.Name=\"one\"", instance.path));
+    EXPECT_FALSE(parsePathText("T_Thing.Name=\"a\"", instance.path));
     return broker_->modifyInstance(instance, std::nullopt);
   }
 
@@ -80,7 +80,7 @@ TEST_F(ClaimsTest, WhatAProviderAsksForIsWithinTheClaimThatItsRequestHas) {
 
 TEST_F(ClaimsTest, AChangeIsFinishedWithinItsClaim) {
   EXPECT_TRUE(change().ok());
-  EXPECT_THAT(story_, ElementsAre("change T_Thing T_Thing.Name=\"one\"", "finished", "released"));
+  EXPECT_THAT(story_, ElementsAre("change T_Thing T_Thing.Name=\"a\"", "finished", "released"));
 }
 
 TEST_F(ClaimsTest, AFailureThatTheProviderDidNotNoticeIsTheStatus) {

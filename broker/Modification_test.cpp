@@ -44,9 +44,9 @@ class ModificationTest : public ::testing::Test {
     Instance instance;
     EXPECT_FALSE(parsePathText(name, instance.path));
     instance.properties = std::move(properties);
-    changes_.clear();
+    effect_ = {};
     lines_.clear();
-    return broker_->modifyInstance(instance, list, {}, &changes_);
+    return broker_->modifyInstance(instance, list, {}, &effect_);
   }
 
   void expectRefused(const Status& status, int rc, const std::string& told) {
@@ -62,7 +62,7 @@ class ModificationTest : public ::testing::Test {
 
   std::mutex mutex_;
   std::vector<std::string> lines_;
-  std::vector<Property> changes_;
+  ModificationEffect effect_;
   std::optional<Broker> broker_;
 };
 
@@ -105,7 +105,15 @@ TEST_F(ModificationTest, AWholeInstanceAsItIsChangesNothing) {
 
 TEST_F(ModificationTest, TellsWhatItChangesInTheTypesOfTheSchema) {
   expectHanded(modify({{"SIZE", Value::text("9")}, labels({"x", "y"})}), "all Size 9");
-  EXPECT_EQ(changes_, std::vector<Property>{size(9)});
+  EXPECT_EQ(effect_.changes, std::vector<Property>{size(9)});
+}
+
+TEST_F(ModificationTest, ReadsAgainWhatItChanged) {
+  expectHanded(modify({size(9)}), "all Size 9");
+  EXPECT_TRUE(effect_.reading.ok());
+  EXPECT_EQ(*effect_.now.property("Size"), size(9).value);
+  expectHanded(modify({size(9)}, std::nullopt, "T_Thing.Name=\"stubborn\""), "all Size 9");
+  EXPECT_EQ(*effect_.now.property("Size"), size(7).value) << "this one takes everything and changes nothing";
 }
 
 TEST_F(ModificationTest, RefusesAnotherValueForWhatCannotBeChanged) {
@@ -130,7 +138,7 @@ TEST_F(ModificationTest, RefusesAListedNameThatTheClassLacks) {
 TEST_F(ModificationTest, ANullIsAValue) {
   expectHanded(modify({{"Size", Value::null(schema::Type::Uint16)}}), "all Size null Labels x y");
   EXPECT_EQ(modify({{"Size", Value::null(schema::Type::Uint16)}}).rc, 0);
-  EXPECT_THAT(changes_, ::testing::IsEmpty()) << "it has none already";
+  EXPECT_THAT(effect_.changes, ::testing::IsEmpty()) << "it has none already";
 }
 
 TEST_F(ModificationTest, WhatIsNotThereIsNotFound) {

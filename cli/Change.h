@@ -17,9 +17,9 @@ struct ChangeOptions {
 };
 
 /// Reads the instance, puts `changes` into it and sends it back; an empty value that is not among the changes is left
-/// out, since sending it would set it. Reads the instance again and warns on stderr of each change that came to
-/// nothing, with what to do. Gives the instance as it is afterwards (or, on a dry run, as it would be sent). Throws
-/// Failure.
+/// out, since sending it would set it. Gives the instance as it is afterwards (or, on a dry run, as it would be sent,
+/// with a warning on stderr of each change that would come to nothing). Throws Failure, also for each change that was
+/// not stored, with the reason and what to do.
 broker::Instance changeInstance(Session& session, const broker::ObjectPath& path,
                                 const std::vector<broker::Property>& changes, const ChangeOptions& options);
 

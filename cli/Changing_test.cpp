@@ -127,7 +127,8 @@ TEST_F(Changing, ModifyChangesOneSettingAndLeavesTheOthers) {
 TEST_F(Changing, ModifyWithOnlySendsWhatIsNamedAlone) {
   host_.directory().write("data/ifcfg-eth0", wholeFileWith("CONFIG_NAME=", "CONFIG_NAME=office"));
   done(host_, {"modify", kSetting, "DomainName=lab.example.org", "--only"});
-  EXPECT_THAT(file(), HasSubstr("CONFIG_NAME=\n")) << "a request without the name empties it";
+  EXPECT_EQ(file(),
+            wholeFileWith("DOMAINNAME=example.org\nCONFIG_NAME=", "DOMAINNAME=lab.example.org\nCONFIG_NAME=office"));
 }
 
 TEST_F(Changing, ModifySetsArraysInTheirOrder) {
@@ -140,11 +141,16 @@ TEST_F(Changing, ModifyEmptiesWhatIsGivenEmpty) {
   EXPECT_THAT(file(), AllOf(HasSubstr("DNSSERVERS=\n"), HasSubstr("DOMAINNAME=\n")));
 }
 
+TEST_F(Changing, ModifyLeavesLinesAloneThatOnlyContainAKey) {
+  const std::string others = "# HOSTNAME is what DHCP is told\nDHCP_HOSTNAME=dhcp\nNISDOMAINNAME=nis\n";
+  host_.directory().write("data/ifcfg-eth0", others + kWholeFile);
+  done(host_, {"modify", kSetting, "DNSServerAddresses=192.0.2.1"});
+  EXPECT_EQ(file(), others + wholeFileWith("192.0.2.53 2001:db8::53 ", "192.0.2.1 "));
+}
+
 TEST_F(Changing, ModifySaysThatNullLeavesAValueAsItIs) {
-  const Outcome outcome = host_.run({"modify", kSetting, "DomainName=null"});
-  EXPECT_EQ(outcome.exitCode, 0);
-  EXPECT_THAT(outcome.err,
-              HasSubstr("DomainName was not stored: null leaves the value as it is; DomainName= empties it"));
+  expectRefused(host_, {"modify", kSetting, "DomainName=null"}, 1,
+                "DomainName was not stored: null leaves the value as it is; an empty value empties it");
   EXPECT_EQ(file(), kWholeFile);
 }
 
@@ -169,23 +175,23 @@ TEST(Modify, OfAnEndpointDoesNotSetWhatTheHostLeavesEmpty) {
   EXPECT_EQ(json::parse(done(host, {"overlay", "show", "-o", "json"})).size(), 1U);
 }
 
-TEST(Modify, WarnsWhereThereIsNoFile) {
+TEST(Modify, FailsWhereThereIsNoFile) {
   const TestHost host;
   const Outcome outcome = host.run({"modify", kSetting, "DomainName=lab.example.org"});
-  EXPECT_EQ(outcome.exitCode, 0);
+  EXPECT_EQ(outcome.exitCode, 1);
   EXPECT_THAT(outcome.err, HasSubstr("DomainName was not stored: " + host.dataFile("ifcfg-eth0") +
                                      " does not exist; 'zorvactl ifcfg init eth0' makes it, then repeat this"));
   EXPECT_FALSE(std::filesystem::exists(host.dataFile("ifcfg-eth0")));
 }
 
-TEST(Modify, WarnsWhereThereIsNoFileAlsoForAValueThatTheHostHasAnyway) {
-  EXPECT_THAT(TestHost().run({"modify", kSetting, "DomainName=example.org"}).err, HasSubstr("was not stored"));
+TEST(Modify, FailsWhereThereIsNoFileAlsoForAValueThatTheHostHasAnyway) {
+  expectRefused(TestHost(), {"modify", kSetting, "DomainName=example.org"}, 1, "was not stored");
 }
 
-TEST_F(Changing, ModifyWarnsWhereTheKeyIsMissing) {
+TEST_F(Changing, ModifyFailsWhereTheKeyIsMissing) {
   host_.directory().write("data/ifcfg-eth0", "HOSTNAME=h\n");
   const Outcome outcome = host_.run({"modify", kSetting, "DomainName=lab.example.org", "RequestedHostname=new"});
-  EXPECT_EQ(outcome.exitCode, 0);
+  EXPECT_EQ(outcome.exitCode, 1);
   EXPECT_THAT(outcome.err, AllOf(HasSubstr("DomainName was not stored"), HasSubstr("has no line DOMAINNAME="),
                                  Not(HasSubstr("RequestedHostname was not stored"))));
   EXPECT_EQ(file(), "HOSTNAME=new\n");
@@ -208,21 +214,22 @@ TEST_F(Changing, IfcfgInitTellsWhereItMayNotWrite) {
                                      ": cannot be opened: Permission denied"));
 }
 
-TEST_F(Changing, ModifyWarnsOfFilesThatAreNone) {
+TEST_F(Changing, ModifyFailsWithFilesThatAreNone) {
   for (const char* kind : {"directory", "pipe", "link"}) {
     std::filesystem::remove_all(host_.dataFile("ifcfg-eth0"));
     if (kind == std::string("directory")) std::filesystem::create_directory(host_.dataFile("ifcfg-eth0"));
     if (kind == std::string("pipe")) ::mkfifo(host_.dataFile("ifcfg-eth0").c_str(), 0600);
     if (kind == std::string("link")) host_.directory().link("/nowhere", "data/ifcfg-eth0");
     const Outcome outcome = host_.run({"modify", kSetting, "DomainName=lab.example.org"});
-    EXPECT_EQ(outcome.exitCode, 0) << kind;
+    EXPECT_EQ(outcome.exitCode, 1) << kind;
     EXPECT_THAT(outcome.err, HasSubstr("DomainName was not stored")) << kind;
   }
 }
 
-TEST_F(Changing, ModifyWarnsOfAPropertyThatItsProviderKeeps) {
-  EXPECT_THAT(host_.run({"modify", kSetting, "Caption=x"}).err,
-              HasSubstr("Caption was not stored: the provider changes no Caption"));
+TEST_F(Changing, ModifyRefusesAPropertyThatItsProviderKeeps) {
+  expectRefused(host_, {"modify", kSetting, "Caption=x", "DomainName=lab.example.org"}, 1,
+                "CIM_ERR_NOT_SUPPORTED (7): these properties of ZORVA_DNSSettingData cannot be changed: Caption\n");
+  EXPECT_EQ(file(), kWholeFile) << "nothing is written where a part is refused";
 }
 
 TEST(Modify, SaysThatTheDataDirectoryIsMissing) {
@@ -303,9 +310,9 @@ TEST_F(Changing, DnsCommandsNameTheInterfacesThereAre) {
   expectRefused(host_, {"dns", "show", "eth7"}, 1, "interface eth7\nzorvactl: there are those of eth0, eth1");
 }
 
-TEST(Dns, WarnsWhereThereIsNoFile) {
+TEST(Dns, FailsWhereThereIsNoFile) {
   const Outcome outcome = TestHost().run({"dns", "set", "eth0", "192.0.2.1"});
-  EXPECT_EQ(outcome.exitCode, 0);
+  EXPECT_EQ(outcome.exitCode, 1);
   EXPECT_THAT(outcome.err, HasSubstr("'zorvactl ifcfg init eth0' makes it"));
   EXPECT_THAT(TestHost().run({"dns", "set", "eth0", "192.0.2.1", "--dry-run"}).err, HasSubstr("would not be stored"));
 }

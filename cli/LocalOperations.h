@@ -1,6 +1,7 @@
 #pragma once
 
 #include "cli/Operations.h"
+#include "frontend/ReadBack.h"
 
 // The CIM operations done by the providers in this process.
 
@@ -29,7 +30,7 @@ class LocalOperations : public Operations {
   }
   broker::Status modifyInstance(const broker::Instance& instance,
                                 const std::optional<std::vector<std::string>>& propertyList) override {
-    return broker_.modifyInstance(instance, propertyList);
+    return frontend::modifyInstance(broker_, instance, propertyList);
   }
   broker::Status associators(const broker::ObjectPath& path, const broker::AssociationFilter& filter,
                              const broker::Selection& selection, const broker::InstanceSink& sink) override {

@@ -25,6 +25,7 @@ class Operations {
   /// The instance gets the keys that were asked for, all of them.
   virtual broker::Status getInstance(const broker::ObjectPath& path, const broker::Selection& selection,
                                      broker::Instance& instance) = 0;
+  /// Here, the providers' success is checked by reading again; a server may do so or not.
   virtual broker::Status modifyInstance(const broker::Instance& instance,
                                         const std::optional<std::vector<std::string>>& propertyList) = 0;
   virtual broker::Status associators(const broker::ObjectPath& path, const broker::AssociationFilter& filter,

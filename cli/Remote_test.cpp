@@ -214,13 +214,13 @@ TEST(RemoteChange, WritesTheSameAsOneWithoutAServer) {
   EXPECT_THAT(contentsOf(there.dataFile("ifcfg-eth0")), HasSubstr("DNSSERVERS=2001:db8::1 192.0.2.2 \n"));
 }
 
-TEST(RemoteChange, WarnsWhereItCameToNothing) {
+TEST(RemoteChange, FailsWhereItCameToNothing) {
   const TestHost host;
   const TestServer server(host);
   const Outcome outcome = host.run({"domain", "eth0", "lab.example.org", "--url", server.url()});
-  EXPECT_EQ(outcome.exitCode, 0);
-  EXPECT_THAT(outcome.err, HasSubstr("DomainName was not stored: the interface's file of settings there is missing, or "
-                                     "has no line DOMAINNAME="));
+  EXPECT_EQ(outcome.exitCode, 1);
+  EXPECT_THAT(outcome.err, HasSubstr("CIM_ERR_FAILED (1): DomainName was not stored: " + host.dataFile("ifcfg-eth0") +
+                                     " does not exist"));
 }
 
 TEST_F(Remote, ReachesTheOtherNamespacesOfAServer) {
@@ -339,6 +339,20 @@ TEST(RemoteTrailers, AGraphGoesOnAfterThem) {
   EXPECT_THAT(outcome.err, AllOf(HasSubstr("ZORVA_DNSSettingData"), HasSubstr("CIM_ERR_NOT_SUPPORTED (7): not here\n"),
                                  HasSubstr("associations of ZORVA_DNSProtocolEndPoint eth0: CIM_ERR_FAILED (1): the "
                                            "provider fell\n")));
+}
+
+TEST(RemoteChange, FailsWhereAServerSaysItWasDoneAndItWasNot) {
+  const auto instance = [](const std::string& domain) {
+    return ScriptedServer::cimReply(
+        "<IRETURNVALUE><INSTANCE CLASSNAME=\"ZORVA_DNSSettingData\"><PROPERTY "
+        "NAME=\"DomainName\" TYPE=\"string\"><VALUE>" +
+        domain + "</VALUE></PROPERTY></INSTANCE></IRETURNVALUE>");
+  };
+  const ScriptedServer server({instance("old"), ScriptedServer::cimReply(""), instance("old")});
+  const Outcome outcome = TestHost().run({"modify", kSetting, "DomainName=new", "--url", server.url()});
+  EXPECT_EQ(outcome.exitCode, 1);
+  EXPECT_THAT(outcome.err, HasSubstr("DomainName was not stored: the interface's file of settings there is missing, or "
+                                     "has no line DOMAINNAME="));
 }
 
 TEST(RemoteFailure, ShowsNoControlCharacterOfAServer) {

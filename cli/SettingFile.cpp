@@ -8,8 +8,10 @@
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
+#include <utility>
 
 #include "agent/Agent.h"
+#include "agent/files/ReadFile.h"
 #include "cli/Failure.h"
 #include "cli/Text.h"
 
@@ -110,29 +112,14 @@ SettingFile::SettingFile(const std::string& interface) : path_(zorvagent::dataDi
   }
 }
 
-bool SettingFile::exists() const {
-  struct stat status {};
-  return ::stat(path_.c_str(), &status) == 0;
-}
-
 std::string SettingFile::contents() const {
-  const Descriptor file(::open(path_.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
-  if (!file.isOpen()) {
-    const int error = errno;
-    fail(path_, std::strerror(error), error == ENOENT ? "zorvactl ifcfg init makes it" : "");
+  zorvagent::FileText file = zorvagent::readFile(path_, kLargestFile);
+  if (file.error == EINVAL) fail(path_, "is no regular file");
+  if (file.error != 0) {
+    fail(path_, std::strerror(file.error), file.error == ENOENT ? "zorvactl ifcfg init makes it" : "");
   }
-  struct stat status {};
-  if (::fstat(file.get(), &status) != 0 || !S_ISREG(status.st_mode)) fail(path_, "is no regular file");
-  std::string text;
-  char buffer[65536];
-  for (;;) {
-    const ssize_t count = ::read(file.get(), buffer, sizeof buffer);
-    if (count < 0 && errno == EINTR) continue;
-    if (count < 0) fail(path_, std::strerror(errno));
-    if (count == 0) return text;
-    text.append(buffer, static_cast<std::size_t>(count));
-    if (text.size() > kLargestFile) fail(path_, "is larger than 16 MiB");
-  }
+  if (file.truncated) fail(path_, "is larger than 16 MiB");
+  return std::move(file.text);
 }
 
 std::vector<SettingLine> SettingFile::read() const {
@@ -148,11 +135,6 @@ std::vector<SettingLine> SettingFile::read() const {
     lines.push_back({std::string(line.substr(0, equals)), std::string(line.substr(equals + 1))});
   }
   return lines;
-}
-
-bool SettingFile::hasPlaceFor(std::string_view key) const {
-  // The providers look for the key anywhere in a line.
-  return contents().find(key) != std::string::npos;
 }
 
 void SettingFile::write(const std::vector<SettingLine>& lines, bool replaces) const {

@@ -31,15 +31,9 @@ class SettingFile {
 
   const std::string& path() const noexcept { return path_; }
 
-  /// True where something stands under the path; that is what decides for the providers.
-  bool exists() const;
-
   /// What follows the first "=" of each line that has one and is no comment, in order. Throws Failure where the file
   /// cannot be read, is no regular file (so nothing blocks), or is larger than 16 MiB.
   std::vector<SettingLine> read() const;
-
-  /// True where the providers, asked to change this key, would change a line. Throws as read does.
-  bool hasPlaceFor(std::string_view key) const;
 
   /// Puts a file of these lines in place, whole or not at all. Throws Failure where it cannot, where a line would not
   /// be one, or, without `replaces`, where the file stands already.

@@ -1,7 +1,6 @@
-#include <algorithm>
-
 #include "cimxml/ElementWriter.h"
 #include "cmpidt.h"
+#include "frontend/ReadBack.h"
 #include "server/Operations.h"
 #include "server/OperationsArguments.h"
 #include "server/OperationsSelection.h"
@@ -93,27 +92,14 @@ Status createInstance(Operation& operation) {
   return {};
 }
 
-/// The properties that a modification gives and its list lets through, without keys, as the class spells them.
-std::vector<std::string> changedNames(const Operation& operation, const Instance& instance,
-                                      const std::optional<std::vector<std::string>>& propertyList) {
-  const schema::Class* declared = operation.classes().find(instance.path.className);
-  std::vector<std::string> names;
-  for (const broker::Property& property : instance.properties) {
-    const schema::ClassProperty* known = declared != nullptr ? declared->findProperty(property.name) : nullptr;
-    const auto isIt = [&property](const std::string& listed) { return schema::sameName(listed, property.name); };
-    if (known == nullptr || known->isKey) continue;
-    if (propertyList && std::none_of(propertyList->begin(), propertyList->end(), isIt)) continue;
-    names.push_back(known->name);
-  }
-  return names;
-}
-
 Status modifyAndNote(const Operation& operation, const Instance& instance,
                      const std::optional<std::vector<std::string>>& propertyList) {
-  Status status = operation.broker.modifyInstance(instance, propertyList, operation.caller);
-  if (!status.ok()) return status;
-  const std::vector<std::string> names = changedNames(operation, instance, propertyList);
-  if (!names.empty()) noteChange(operation, "changed", instance.path, names);
+  std::vector<broker::Property> changed;
+  Status status = frontend::modifyInstance(operation.broker, instance, propertyList, operation.caller, &changed);
+  if (!status.ok() || changed.empty()) return status;
+  std::vector<std::string> names;
+  for (const broker::Property& property : changed) names.push_back(property.name);
+  noteChange(operation, "changed", instance.path, names);
   return status;
 }
 

@@ -173,6 +173,25 @@ TEST_F(OperationsTest, ModifyInstanceRefusesValuesAndPropertiesThatDoNotFit) {
   EXPECT_THAT(modify(R"(<PROPERTY NAME="Nope" TYPE="uint16"/>)"), HasSubstr("12 T_Thing has no property Nope"));
 }
 
+TEST_F(OperationsTest, ModifyInstanceFailsWhereNothingWasStored) {
+  const std::string modified =
+      "<VALUE.NAMEDINSTANCE>" + thing("stubborn") +
+      R"(<INSTANCE CLASSNAME="T_Thing"><PROPERTY NAME="Size" TYPE="uint16"><VALUE>9</VALUE></PROPERTY></INSTANCE>)"
+      "</VALUE.NAMEDINSTANCE>";
+  EXPECT_EQ(errorOf("ModifyInstance", parameter("ModifiedInstance", modified)),
+            "1 Size was not stored: the provider took it and still says otherwise");
+  EXPECT_EQ(errorOf("SetProperty", parameter("InstanceName", thing("stubborn")) + text("PropertyName", "Size") +
+                                       text("NewValue", "9")),
+            "1 Size was not stored: the provider took it and still says otherwise");
+}
+
+TEST_F(OperationsTest, AnInstanceHasAPropertyElementForEachProperty) {
+  const std::string response = ask("GetInstance", parameter("InstanceName", thing("a")) + text("LocalOnly", "false"));
+  EXPECT_THAT(response, HasSubstr("<PROPERTY NAME=\"Tiny\" TYPE=\"uint8\"></PROPERTY>"));
+  EXPECT_THAT(response, HasSubstr("<PROPERTY.ARRAY NAME=\"Numbers\" TYPE=\"uint16\"></PROPERTY.ARRAY>"));
+  EXPECT_EQ(count(response, "<PROPERTY"), 17U);
+}
+
 TEST_F(OperationsTest, DeleteInstanceDeletes) {
   EXPECT_THAT(ask("DeleteInstance", parameter("InstanceName", thing("a"))),
               HasSubstr("<IMETHODRESPONSE NAME=\"DeleteInstance\"></IMETHODRESPONSE>"));

@@ -9,6 +9,7 @@
 
 #include <array>
 #include <cstdio>
+#include <filesystem>
 #include <string>
 #include <vector>
 
@@ -20,6 +21,7 @@ namespace {
 using ::testing::AllOf;
 using ::testing::HasSubstr;
 using ::testing::Not;
+using zorvagent::testing::contentsOf;
 
 constexpr const char* kTree = R"json({ "system_name": "host1", "nodes": [
   { "type": "System", "name": "system", "description": "Computer", "children": [
@@ -28,6 +30,9 @@ constexpr const char* kTree = R"json({ "system_name": "host1", "nodes": [
         "name": "eth0", "host_name": "host1", "domain_name": "example.org", "dns_suffixes": ["example.org"],
         "dns_server_addresses": ["192.0.2.53", "2001:db8::53"], "protocol_if_type": 4097, "enabled_state": 1,
         "addresses": [ { "address": "192.0.2.10", "prefix_length": 24, "origin": "static" } ] } } ] } ] } ] })json";
+
+constexpr const char* kFile =
+    "HOSTNAME=host1\nDOMAINNAME=example.org\nCONFIG_NAME=office\nDNSSERVERS=192.0.2.53 \nDNSSUFFIXES=example.org \n";
 
 /// A program's standard output and error.
 std::string outputOf(const std::vector<std::string>& words, int& exitCode) {
@@ -65,6 +70,7 @@ class Server {
                                        "\"\n[tree]\nsource = \"file\"\nfile = \"" + (directory_ / "tree.json") +
                                        "\"\n[log]\ntarget = \"off\"\n");
     directory_.write("server.toml", "");
+    directory_.write("data/ifcfg-eth0", kFile);
     std::array<int, 2> ends{};
     EXPECT_EQ(pipe2(ends.data(), O_CLOEXEC), 0);
     process_ = fork();
@@ -91,6 +97,9 @@ class Server {
   Server(const Server&) = delete;
   Server& operator=(const Server&) = delete;
 
+  /// The file of the interface's settings.
+  std::string file() const { return directory_ / "data/ifcfg-eth0"; }
+
   std::string url(const std::string& rest) const { return "http://localhost:" + std::to_string(port_) + "/" + rest; }
 
  private:
@@ -102,6 +111,8 @@ class Server {
 constexpr const char* kEndpoint =
     "root/cimv2:ZORVA_DNSProtocolEndPoint.SystemCreationClassName=\"ZORVA_ComputerSystem\","
     "CreationClassName=\"ZORVA_DNSProtocolEndPoint\",SystemName=\"host1\",Name=\"eth0\"";
+constexpr const char* kSetting = "root/cimv2:ZORVA_DNSSettingData.InstanceID=\"Computer%eth0\"";
+constexpr const char* kGeneralSetting = "root/cimv2:ZORVA_DNSGeneralSettingData.InstanceID=\"dnsgen1:host1\"";
 constexpr const char* kProfile = "interop:CIM_RegisteredProfile.InstanceID=\"ZORVA:DNSClient:1.0.0\"";
 
 class Wbemcli : public ::testing::Test {
@@ -174,6 +185,33 @@ TEST_F(Wbemcli, ChangesThings) {
   EXPECT_THAT(ask("ci", kEndpoint, {"Name=\"eth9\""}), HasSubstr("(7) CIM_ERR_NOT_SUPPORTED"));
   EXPECT_THAT(ask("di", kEndpoint), HasSubstr("(7) CIM_ERR_NOT_SUPPORTED"));
   EXPECT_THAT(ask("dc", "root/cimv2:CIM_DNSSettingData"), HasSubstr("(7) CIM_ERR_NOT_SUPPORTED"));
+}
+
+TEST_F(Wbemcli, ChangesOneSettingAndLeavesTheOthers) {
+  EXPECT_EQ(ask("mi", kSetting, {"DomainName=\"example.net\""}), "");
+  EXPECT_EQ(ask("sp", kSetting, {"RequestedHostname=\"host2\""}), "");
+  EXPECT_EQ(ask("mi", kGeneralSetting, {"DNSSuffixesToAppend=\"a.example\",\"b.example\""}), "");
+  EXPECT_EQ(contentsOf(server_->file()),
+            "HOSTNAME=host2\nDOMAINNAME=example.net\nCONFIG_NAME=office\nDNSSERVERS=192.0.2.53 \n"
+            "DNSSUFFIXES=a.example b.example \n");
+}
+
+TEST_F(Wbemcli, IsToldWhatCannotBeChanged) {
+  // It sends the whole instance, and so all that has no value.
+  EXPECT_THAT(ask("mi", kSetting, {"Caption=\"x\""}), HasSubstr("(7) CIM_ERR_NOT_SUPPORTED: these properties of "
+                                                                "ZORVA_DNSSettingData cannot be changed: Caption"));
+  EXPECT_THAT(ask("mi", kSetting, {"SoID=\"x\""}), HasSubstr("cannot be changed: SoID"));
+  EXPECT_THAT(ask("mi", kSetting, {"InstanceID=\"x\""}), HasSubstr("(4) CIM_ERR_INVALID_PARAMETER: the key"));
+  EXPECT_EQ(contentsOf(server_->file()), kFile);
+}
+
+TEST_F(Wbemcli, IsToldWhatWasNotStored) {
+  std::filesystem::remove(server_->file());
+  for (const char* operation : {"mi", "sp"}) {
+    EXPECT_THAT(ask(operation, kSetting, {"DomainName=\"lab.example.org\""}),
+                HasSubstr("(1) CIM_ERR_FAILED: DomainName was not stored: " + server_->file() + " does not exist"));
+  }
+  EXPECT_EQ(ask("mi", kSetting, {"DomainName=\"example.org\""}), "") << "the host says so already";
 }
 
 TEST_F(Wbemcli, FindsOutWhatIsHere) {
