@@ -399,11 +399,11 @@ TEST_F(OperationsTest, AChangeLeavesALineThatSaysWhoChangedWhat) {
   invoke("Call", thing("a"), "<PARAMVALUE NAME=\"Text\"><VALUE>x</VALUE></PARAMVALUE>");
   ask("DeleteInstance", parameter("InstanceName", thing("a")));
   EXPECT_THAT(service_.changes(),
-              ::testing::ElementsAre("192.0.2.1:4711 changed root/cimv2:T_Thing.Name=\"a\": Size, Wide",
-                                     "192.0.2.1:4711 changed root/cimv2:T_Thing.Name=\"a\": Wide",
-                                     "192.0.2.1:4711 changed root/cimv2:T_Thing.Name=\"a\": Size",
-                                     "192.0.2.1:4711 called Call of root/cimv2:T_Thing.Name=\"a\": Text",
-                                     "192.0.2.1:4711 deleted root/cimv2:T_Thing.Name=\"a\""));
+              ::testing::ElementsAre("192.0.2.1:4711 (user 7) changed root/cimv2:T_Thing.Name=\"a\": Size, Wide",
+                                     "192.0.2.1:4711 (user 7) changed root/cimv2:T_Thing.Name=\"a\": Wide",
+                                     "192.0.2.1:4711 (user 7) changed root/cimv2:T_Thing.Name=\"a\": Size",
+                                     "192.0.2.1:4711 (user 7) called Call of root/cimv2:T_Thing.Name=\"a\": Text",
+                                     "192.0.2.1:4711 (user 7) deleted root/cimv2:T_Thing.Name=\"a\""));
 }
 
 TEST_F(OperationsTest, WhatFailsOrReadsLeavesNoLineOfAChange) {

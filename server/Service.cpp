@@ -125,6 +125,11 @@ std::string withoutControls(std::string text) {
   return text;
 }
 
+/// "127.0.0.1:4711 (user 1000)"
+std::string whoIs(const HttpRequest& http) {
+  return http.client.empty() ? http.peer : http.peer + " (" + http.client + ")";
+}
+
 /// The memory that this thread's responses gather in, used again and again.
 class Buffer {
  public:
@@ -211,7 +216,7 @@ class ServiceCore {
     writer.beginMessage(request.id, request.isMultiple);
     for (const cimxml::Call& call : request.calls) {
       writer.beginResponse(call.name, call.isExtrinsic);
-      const auto note = [&](const std::string& what) { noteChange(client.http.peer + " " + what); };
+      const auto note = [&](const std::string& what) { noteChange(whoIs(client.http) + " " + what); };
       Operation operation{broker_, pulls_, host_, client.caller, call, writer, client.http.client, client.headers.host,
                           {},      note};
       const Status status = carryOutSafely(operation);

@@ -91,7 +91,7 @@ std::string message(const std::string& content) {
 }
 
 HttpRequest post(const std::string& body, HeaderList headers) {
-  return {"POST", "/cimom", std::move(headers), body, false, {}, "192.0.2.1:4711"};
+  return {"POST", "/cimom", std::move(headers), body, false, "user 7", "192.0.2.1:4711"};
 }
 
 HttpRequest request(const std::string& operation, const std::string& parameters, const std::string& nameSpace) {
