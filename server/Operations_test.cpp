@@ -307,7 +307,7 @@ TEST_F(OperationsTest, EnumerateClassesGivesThoseBelow) {
 TEST_F(OperationsTest, QualifierTypesCanBeRead) {
   EXPECT_THAT(ask("GetQualifier", text("QualifierName", "key")),
               HasSubstr("<IRETURNVALUE><QUALIFIER.DECLARATION NAME=\"Key\" TYPE=\"boolean\""));
-  EXPECT_EQ(count(ask("EnumerateQualifiers", ""), "<QUALIFIER.DECLARATION"), 12U);
+  EXPECT_EQ(count(ask("EnumerateQualifiers", ""), "<QUALIFIER.DECLARATION"), 13U);
   EXPECT_THAT(errorOf("GetQualifier", text("QualifierName", "No")), HasSubstr("6 there is no qualifier type"));
 }
 
@@ -388,19 +388,20 @@ TEST_F(OperationsTest, AChangeLeavesALineThatSaysWhoChangedWhat) {
                                     "<VALUE.NAMEDINSTANCE>" + thing("a") +
                                         R"(<INSTANCE CLASSNAME="T_Thing"><PROPERTY NAME="Name" TYPE="string"><VALUE>a)"
                                         R"(</VALUE></PROPERTY><PROPERTY NAME="size" TYPE="uint16"><VALUE>9</VALUE>)"
-                                        R"(</PROPERTY><PROPERTY NAME="Wide" TYPE="uint32"><VALUE>1</VALUE></PROPERTY>)"
+                                        R"(</PROPERTY><PROPERTY.ARRAY NAME="Labels" TYPE="string"><VALUE.ARRAY>)"
+                                        "<VALUE>z</VALUE></VALUE.ARRAY></PROPERTY.ARRAY>"
                                         "</INSTANCE></VALUE.NAMEDINSTANCE>") +
                               more);
   };
   modify("");
-  modify(names("PropertyList", {"WIDE"}));
+  modify(names("PropertyList", {"LABELS"}));
   modify(names("PropertyList", {}));
   ask("SetProperty", parameter("InstanceName", thing("a")) + text("PropertyName", "size") + text("NewValue", "12"));
   invoke("Call", thing("a"), "<PARAMVALUE NAME=\"Text\"><VALUE>x</VALUE></PARAMVALUE>");
   ask("DeleteInstance", parameter("InstanceName", thing("a")));
   EXPECT_THAT(service_.changes(),
-              ::testing::ElementsAre("192.0.2.1:4711 (user 7) changed root/cimv2:T_Thing.Name=\"a\": Size, Wide",
-                                     "192.0.2.1:4711 (user 7) changed root/cimv2:T_Thing.Name=\"a\": Wide",
+              ::testing::ElementsAre("192.0.2.1:4711 (user 7) changed root/cimv2:T_Thing.Name=\"a\": Size, Labels",
+                                     "192.0.2.1:4711 (user 7) changed root/cimv2:T_Thing.Name=\"a\": Labels",
                                      "192.0.2.1:4711 (user 7) changed root/cimv2:T_Thing.Name=\"a\": Size",
                                      "192.0.2.1:4711 (user 7) called Call of root/cimv2:T_Thing.Name=\"a\": Text",
                                      "192.0.2.1:4711 (user 7) deleted root/cimv2:T_Thing.Name=\"a\""));
@@ -415,10 +416,15 @@ TEST_F(OperationsTest, WhatFailsOrReadsLeavesNoLineOfAChange) {
 }
 
 TEST_F(OperationsTest, AClientWritesNoLinesOfItsOwnIntoTheLineOfAChange) {
-  ask("CreateInstance", parameter("NewInstance", R"(<INSTANCE CLASSNAME="T_Thing"><PROPERTY NAME="Name" TYPE="string">)"
-                                                 "<VALUE>x&#10;2026 forged&#127;</VALUE></PROPERTY></INSTANCE>"));
-  ASSERT_EQ(service_.changes().size(), 1U);
-  EXPECT_THAT(service_.changes()[0], HasSubstr("created root/cimv2:T_Thing.Name=\"x\\n2026 forged?"));
+  const HttpRequest asked =
+      testing::post(testing::message(testing::extrinsic("Call", thing("x&#10;2026 forged&#127;"),
+                                                        "<PARAMVALUE NAME=\"Text\"><VALUE>x</VALUE></PARAMVALUE>")),
+                    {{"CIMOperation", "MethodCall"},
+                     {"CIMMethod", "Call"},
+                     {"CIMObject", "root/cimv2:T_Thing.Name=\"x%0A2026 forged%7F\""}});
+  EXPECT_EQ(service_.ask(asked).status, 200);
+  EXPECT_THAT(service_.changes(), ::testing::ElementsAre("192.0.2.1:4711 (user 7) called Call of "
+                                                         "root/cimv2:T_Thing.Name=\"x\\n2026 forged?\": Text"));
 }
 
 // What goes wrong.

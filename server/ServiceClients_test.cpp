@@ -66,6 +66,7 @@ class Server {
  public:
   Server() {
     directory_.write("tree.json", kTree);
+    directory_.write("data/keep", "");
     directory_.write("agent.toml", "[agent]\ndata_dir = \"" + (directory_ / "data/") +
                                        "\"\n[tree]\nsource = \"file\"\nfile = \"" + (directory_ / "tree.json") +
                                        "\"\n[log]\ntarget = \"off\"\n");

@@ -7,6 +7,7 @@
 #include <semaphore>
 #include <thread>
 
+#include "cimxml/testing/Grammar.h"
 #include "server/ServiceHarness.h"
 
 namespace zorva::server {
@@ -267,7 +268,7 @@ TEST(Service, LeavesALateAnswerInWhichEachOperationHasFailed) {
   EXPECT_THAT(late.body, HasSubstr("<IMETHODRESPONSE NAME=\"EnumerateInstanceNames\"><ERROR CODE=\"1\" "
                                    "DESCRIPTION=\"it took too long\"/>"));
   EXPECT_THAT(late.body, HasSubstr("<METHODRESPONSE NAME=\"M\"><ERROR CODE=\"1\""));
-  EXPECT_EQ(testing::dtdProblem(late.body), "");
+  EXPECT_EQ(cimxml::testing::grammarProblem(late.body), "");
 }
 
 TEST(Service, DoesNotReadOnWhereNobodyWaitsAnyMore) {
