@@ -9,22 +9,22 @@
 namespace ZV {
 
 template <typename Cursor>
-void setTextIfWanted(const CMPIInstance* instance, const WantedProperties& wanted, const char* name,
-                     const Cursor& cursor, bool (Cursor::*getter)(std::string&) const) {
+void setTextIfWanted(const CMPIInstance* instance, const WantedProperties& wanted, const char* name, Cursor& cursor,
+                     bool (Cursor::*getter)(std::string&)) {
   std::string value;
   if (wanted(name) && (cursor.*getter)(value)) setText(instance, name, value);
 }
 
 template <typename Cursor>
-void setUint16IfWanted(const CMPIInstance* instance, const WantedProperties& wanted, const char* name,
-                       const Cursor& cursor, bool (Cursor::*getter)(unsigned short&) const) {
+void setUint16IfWanted(const CMPIInstance* instance, const WantedProperties& wanted, const char* name, Cursor& cursor,
+                       bool (Cursor::*getter)(unsigned short&)) {
   unsigned short value = 0;
   if (wanted(name) && (cursor.*getter)(value)) setUint16(instance, name, value);
 }
 
 template <typename Cursor>
-void setBooleanIfWanted(const CMPIInstance* instance, const WantedProperties& wanted, const char* name,
-                        const Cursor& cursor, bool (Cursor::*getter)(bool&) const) {
+void setBooleanIfWanted(const CMPIInstance* instance, const WantedProperties& wanted, const char* name, Cursor& cursor,
+                        bool (Cursor::*getter)(bool&)) {
   bool value = false;
   if (wanted(name) && (cursor.*getter)(value)) setBoolean(instance, name, value);
 }

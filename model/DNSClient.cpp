@@ -112,13 +112,13 @@ void warnUnless(bool usable, const LogSite& site, const char* text) {
   if (!usable) logMessage(loggerDNSClient, site, LOG_LEVEL_DETAIL, text);
 }
 
-const char* systemClassOf(const Instrumentation& cursor, const LogSite& site) {
+const char* systemClassOf(Instrumentation& cursor, const LogSite& site) {
   const std::string nodeString = owningSystemDescription(cursor);
   logVariable(loggerDNSClient, site, "nodeString", nodeString);
   return nodeString == kServiceProcessorDescription ? spcomputerSystemClass : computerSystemClass;
 }
 
-void addClient(const Instrumentation& cursor, const LogSite& site, std::map<std::string, DNSClient>& dnsClientMap) {
+void addClient(Instrumentation& cursor, const LogSite& site, std::map<std::string, DNSClient>& dnsClientMap) {
   std::string key;
   std::string string;
   std::vector<std::string> suffixes;

@@ -25,6 +25,16 @@ static const CMPIBroker* broker = nullptr;
 
 constexpr CMPIStatus kNotSupported = {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
 
+// A function table of these members. Later versions of CMPI have appended slots to the tables; they stay null.
+template <typename Table, typename... Members>
+constexpr Table tableOf(Members... members) {
+  if constexpr (requires { Table{members..., nullptr}; }) {
+    return tableOf<Table>(members..., nullptr);
+  } else {
+    return Table{members...};
+  }
+}
+
 }  // namespace ZV
 
 // What no provider does: nothing is held across calls, so there is nothing to clean up, and no object can be made or
@@ -55,27 +65,25 @@ constexpr CMPIStatus kNotSupported = {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
   static CMPIStatus stem##_AssociationCleanup(CMPIAssociationMI*, const CMPIContext*, CMPIBoolean) { return kStatusOk; }
 
 // The table of a provider's instance operations and the create function that hands it out.
-#define ZV_INSTANCE_MI(prefix, stem)                                                                          \
-  namespace ZV {                                                                                              \
-  static CMPIInstanceMIFT instMIFT__ = {                                                                      \
-      ZV_TABLE_VERSION,         ZV_TABLE_VERSION,      "instance" #prefix, stem##_Cleanup,                    \
-      stem##_EnumInstanceNames, stem##_EnumInstances,  stem##_GetInstance, stem##_CreateInstance,             \
-      stem##_ModifyInstance,    stem##_DeleteInstance, stem##_ExecQuery,                                      \
-  };                                                                                                          \
-  }                                                                                                           \
-  ZV_PROVIDER_EXPORT CMPIInstanceMI* prefix##_Create_InstanceMI(const CMPIBroker* broker, const CMPIContext*, \
-                                                                CMPIStatus*) {                                \
-    static CMPIInstanceMI mi = {nullptr, &ZV::instMIFT__};                                                    \
-    ZV::broker = broker;                                                                                      \
-    return &mi;                                                                                               \
+#define ZV_INSTANCE_MI(prefix, stem)                                                                                 \
+  namespace ZV {                                                                                                     \
+  static constinit CMPIInstanceMIFT instMIFT__ = tableOf<CMPIInstanceMIFT>(                                          \
+      ZV_TABLE_VERSION, ZV_TABLE_VERSION, "instance" #prefix, stem##_Cleanup, stem##_EnumInstanceNames,              \
+      stem##_EnumInstances, stem##_GetInstance, stem##_CreateInstance, stem##_ModifyInstance, stem##_DeleteInstance, \
+      stem##_ExecQuery);                                                                                             \
+  }                                                                                                                  \
+  ZV_PROVIDER_EXPORT CMPIInstanceMI* prefix##_Create_InstanceMI(const CMPIBroker* broker, const CMPIContext*,        \
+                                                                CMPIStatus*) {                                       \
+    static CMPIInstanceMI mi = {nullptr, &ZV::instMIFT__};                                                           \
+    ZV::broker = broker;                                                                                             \
+    return &mi;                                                                                                      \
   }
 
 #define ZV_ASSOCIATION_MI(prefix, stem)                                                                             \
   namespace ZV {                                                                                                    \
-  static CMPIAssociationMIFT assocMIFT__ = {                                                                        \
-      ZV_TABLE_VERSION,   ZV_TABLE_VERSION,       "association" #prefix, stem##_AssociationCleanup,                 \
-      stem##_Associators, stem##_AssociatorNames, stem##_References,     stem##_ReferenceNames,                     \
-  };                                                                                                                \
+  static constinit CMPIAssociationMIFT assocMIFT__ = tableOf<CMPIAssociationMIFT>(                                  \
+      ZV_TABLE_VERSION, ZV_TABLE_VERSION, "association" #prefix, stem##_AssociationCleanup, stem##_Associators,     \
+      stem##_AssociatorNames, stem##_References, stem##_ReferenceNames);                                            \
   }                                                                                                                 \
   ZV_PROVIDER_EXPORT CMPIAssociationMI* prefix##_Create_AssociationMI(const CMPIBroker* broker, const CMPIContext*, \
                                                                       CMPIStatus*) {                                \
@@ -86,9 +94,8 @@ constexpr CMPIStatus kNotSupported = {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
 
 #define ZV_METHOD_MI(prefix, stem)                                                                        \
   namespace ZV {                                                                                          \
-  static CMPIMethodMIFT methMIFT__ = {                                                                    \
-      ZV_TABLE_VERSION, ZV_TABLE_VERSION, "method" #prefix, stem##_MethodCleanup, stem##_InvokeMethod,    \
-  };                                                                                                      \
+  static constinit CMPIMethodMIFT methMIFT__ = tableOf<CMPIMethodMIFT>(                                   \
+      ZV_TABLE_VERSION, ZV_TABLE_VERSION, "method" #prefix, stem##_MethodCleanup, stem##_InvokeMethod);   \
   }                                                                                                       \
   ZV_PROVIDER_EXPORT CMPIMethodMI* prefix##_Create_MethodMI(const CMPIBroker* broker, const CMPIContext*, \
                                                             CMPIStatus*) {                                \

@@ -31,43 +31,43 @@ DNSGeneralSettingData& DNSGeneralSettingData::operator++() {
   return *this;
 }
 
-bool DNSGeneralSettingData::getInstanceID(std::string& value) const {
+bool DNSGeneralSettingData::getInstanceID(std::string& value) {
   if (getProperty(NodeLexicon::PROP_NAME, value)) return true;
   logError(loggerDNSGeneralSettingData, ZV_HERE, "Name Property is not available from Instrumentation");
   return false;
 }
 
-bool DNSGeneralSettingData::getElementName(std::string& value) const {
+bool DNSGeneralSettingData::getElementName(std::string& value) {
   value = "DNSGeneralSettingData";
   return true;
 }
 
-bool DNSGeneralSettingData::getCaption(std::string& value) const {
+bool DNSGeneralSettingData::getCaption(std::string& value) {
   value = "DNS General Configuration";
   return true;
 }
 
-bool DNSGeneralSettingData::getDescription(std::string& value) const {
+bool DNSGeneralSettingData::getDescription(std::string& value) {
   value = "Represents DNS General Configuration for DNS Protocol EndPoint";
   return true;
 }
 
-bool DNSGeneralSettingData::getAddressOrigin(unsigned short& value) const {
+bool DNSGeneralSettingData::getAddressOrigin(unsigned short& value) {
   value = 2;
   return true;
 }
 
-bool DNSGeneralSettingData::getAppendPrimarySuffixes(bool&) const { return false; }
+bool DNSGeneralSettingData::getAppendPrimarySuffixes(bool&) { return false; }
 
-bool DNSGeneralSettingData::getAppendParentSuffixes(bool&) const { return false; }
+bool DNSGeneralSettingData::getAppendParentSuffixes(bool&) { return false; }
 
-std::string DNSGeneralSettingData::getFileName() const {
+std::string DNSGeneralSettingData::getFileName() {
   std::string name;
   getInstanceID(name);
   return interfaceFileName(name);
 }
 
-bool DNSGeneralSettingData::getConfigurationName(std::string& value) const {
+bool DNSGeneralSettingData::getConfigurationName(std::string& value) {
   const std::string fileName = getFileName();
   if (!interfaceFileExists(fileName)) return false;
   value = readScalar(fileName, "CONFIG_NAME", loggerDNSGeneralSettingData, ZV_HERE, "configurationName");
@@ -75,7 +75,7 @@ bool DNSGeneralSettingData::getConfigurationName(std::string& value) const {
 }
 
 // True also where the node has no suffixes, unlike the server addresses of the sibling.
-bool DNSGeneralSettingData::getDNSSuffixesToAppend(std::vector<std::string>& values) const {
+bool DNSGeneralSettingData::getDNSSuffixesToAppend(std::vector<std::string>& values) {
   const std::string fileName = getFileName();
   if (interfaceFileExists(fileName)) {
     readList(fileName, "DNSSUFFIXES", values);

@@ -23,17 +23,17 @@ class DNSGeneralSettingData : public Instrumentation {
   DNSGeneralSettingData& operator++();
 
   // The interface's name: what the file's name is made with, and no part of the CIM InstanceID.
-  bool getInstanceID(std::string& value) const;
-  bool getElementName(std::string& value) const;
-  bool getCaption(std::string& value) const;
-  bool getDescription(std::string& value) const;
-  bool getAddressOrigin(unsigned short& value) const;
-  bool getAppendPrimarySuffixes(bool& value) const;  // false
-  bool getAppendParentSuffixes(bool& value) const;   // false
+  bool getInstanceID(std::string& value);
+  bool getElementName(std::string& value);
+  bool getCaption(std::string& value);
+  bool getDescription(std::string& value);
+  bool getAddressOrigin(unsigned short& value);
+  bool getAppendPrimarySuffixes(bool& value);  // false
+  bool getAppendParentSuffixes(bool& value);   // false
 
   // From the file while there is one, a missing key as empty text.
-  bool getConfigurationName(std::string& value) const;                  // else false
-  bool getDNSSuffixesToAppend(std::vector<std::string>& values) const;  // else from the node, or empty; always true
+  bool getConfigurationName(std::string& value);                  // else false
+  bool getDNSSuffixesToAppend(std::vector<std::string>& values);  // else from the node, or empty; always true
 
   // Writes to the file, adding the key where it is missing; always true.
   bool setConfigurationName(const std::string& value);
@@ -41,7 +41,7 @@ class DNSGeneralSettingData : public Instrumentation {
   bool setDNSSuffixesToAppend(std::vector<std::string> values);
 
   // The path of the interface's file; it ends in "ifcfg-" where the node has no name.
-  std::string getFileName() const;
+  std::string getFileName();
 };
 
 }  // namespace ZV

@@ -28,7 +28,7 @@ class DNSGeneralSettingDataTest : public ::testing::Test {
     world_.nic("eth0", usualNic());
     return found();
   }
-  std::vector<std::string> suffixes(const DNSGeneralSettingData& data) {
+  std::vector<std::string> suffixes(DNSGeneralSettingData data) {
     std::vector<std::string> values;
     EXPECT_TRUE(data.getDNSSuffixesToAppend(values));
     return values;
@@ -37,10 +37,10 @@ class DNSGeneralSettingDataTest : public ::testing::Test {
   World world_;
 };
 
-using Text = bool (DNSGeneralSettingData::*)(std::string&) const;
+using Text = bool (DNSGeneralSettingData::*)(std::string&);
 
 // What a getter says, with what its output holds: "before" where it was left as it was.
-std::pair<bool, std::string> get(const DNSGeneralSettingData& data, Text getter) {
+std::pair<bool, std::string> get(DNSGeneralSettingData data, Text getter) {
   std::string value = "before";
   const bool given = (data.*getter)(value);
   return {given, value};
@@ -71,7 +71,7 @@ TEST_F(DNSGeneralSettingDataTest, StandsOnNothingWhereAllInterfacesAreTheService
 TEST_F(DNSGeneralSettingDataTest, SkipsTheServiceProcessorsInterfaces) {
   world_.bmc().nic("bmc0", usualNic()).host().nic("eth0");
   world_.file("bmc0", "CONFIG_NAME=wrong\n").file("eth0", kBothKeys);
-  const DNSGeneralSettingData data = found();
+  DNSGeneralSettingData data = found();
   EXPECT_EQ(std::pair(true, "eth0"s), get(data, &DNSGeneralSettingData::getInstanceID));
   EXPECT_EQ(std::pair(true, "office"s), get(data, &DNSGeneralSettingData::getConfigurationName));
 }
@@ -164,7 +164,7 @@ TEST_F(DNSGeneralSettingDataTest, ItsInstanceIDIsTheNameOfTheInterface) {
 
 TEST_F(DNSGeneralSettingDataTest, ANodeWithoutANameHasNoInstanceIDAndThatIsTold) {
   world_.nic("x", {.isUnnamed = true});
-  const DNSGeneralSettingData data = found();
+  DNSGeneralSettingData data = found();
   const RecordingLogger logger;
   EXPECT_EQ(kUntouched, get(data, &DNSGeneralSettingData::getInstanceID));
   const LogLines lines = logger.pairs();
@@ -173,7 +173,7 @@ TEST_F(DNSGeneralSettingDataTest, ANodeWithoutANameHasNoInstanceIDAndThatIsTold)
 }
 
 TEST_F(DNSGeneralSettingDataTest, ElementNameCaptionDescriptionAndOriginAreConstants) {
-  const DNSGeneralSettingData data = atUsualNic();
+  DNSGeneralSettingData data = atUsualNic();
   EXPECT_EQ(std::pair(true, "DNSGeneralSettingData"s), get(data, &DNSGeneralSettingData::getElementName));
   EXPECT_EQ(std::pair(true, "DNS General Configuration"s), get(data, &DNSGeneralSettingData::getCaption));
   EXPECT_EQ(std::pair(true, "Represents DNS General Configuration for DNS Protocol EndPoint"s),
@@ -184,7 +184,7 @@ TEST_F(DNSGeneralSettingDataTest, ElementNameCaptionDescriptionAndOriginAreConst
 }
 
 TEST_F(DNSGeneralSettingDataTest, WhetherToAppendSuffixesIsNeverGivenAndLeavesTheOutputAsItWas) {
-  const DNSGeneralSettingData data = atUsualNic();
+  DNSGeneralSettingData data = atUsualNic();
   for (const bool before : {false, true}) {
     bool value = before;
     EXPECT_FALSE(data.getAppendPrimarySuffixes(value));
@@ -197,7 +197,7 @@ TEST_F(DNSGeneralSettingDataTest, WhetherToAppendSuffixesIsNeverGivenAndLeavesTh
 
 TEST_F(DNSGeneralSettingDataTest, TheConfigurationNameIsThatOfTheFileAndTold) {
   world_.file("eth0", kBothKeys);
-  const DNSGeneralSettingData data = atUsualNic();
+  DNSGeneralSettingData data = atUsualNic();
   const RecordingLogger logger;
   EXPECT_EQ(std::pair(true, "office"s), get(data, &DNSGeneralSettingData::getConfigurationName));
   EXPECT_THAT(logger.pairs().briefsWithCategory(), ElementsAre(variable("configurationName", "office")));
@@ -235,7 +235,7 @@ TEST_F(DNSGeneralSettingDataTest, SuffixesAreGivenAlsoWhereNobodyHasThem) {
 
 TEST_F(DNSGeneralSettingDataTest, ANodeWithoutANameHasAFileWhoseNameEndsInTheHyphen) {
   world_.nic("x", {.suffixes = {"node.example.org"}, .isUnnamed = true});
-  const DNSGeneralSettingData data = found();
+  DNSGeneralSettingData data = found();
   const RecordingLogger logger;
   EXPECT_EQ(world_.dataDir() + "ifcfg-", data.getFileName());
   EXPECT_THAT(suffixes(data), ElementsAre("node.example.org"));

@@ -12,6 +12,8 @@ namespace ZV {
 // operator++. A copy stands on the same node. Belongs to one operation and one thread. Exceptions of the
 // instrumentation pass out.
 //
+// No member is const: the cursor's own members need not be.
+//
 // A getter returns false where the value is not to be set on an instance; its output is then untouched, or empty where
 // the node was asked in the place of the file. The readers of the interface's file rely on operator bool having run for
 // the node.
@@ -26,23 +28,23 @@ class DNSSettingData : public Instrumentation {
 
   std::string getFileName() const { return fileName; }
 
-  bool getInstanceID(std::string& value) const;  // "BMC%" or "Computer%", by the owning system, and the name
-  bool getElementName(std::string& value) const;
-  bool getCaption(std::string& value) const;
-  bool getDescription(std::string& value) const;
-  bool getAddressOrigin(unsigned short& value) const;
+  bool getInstanceID(std::string& value);  // "BMC%" or "Computer%", by the owning system, and the name
+  bool getElementName(std::string& value);
+  bool getCaption(std::string& value);
+  bool getDescription(std::string& value);
+  bool getAddressOrigin(unsigned short& value);
 
   // From the file while there is one, a missing key as empty text; else from the node, false and empty where that has
   // none. The boot protocol and the configuration's name stand in the file alone.
-  bool getBootProtocol(std::string& value) const;
-  bool getDomainName(std::string& value) const;
-  bool getRequestedHostname(std::string& value) const;
-  bool getConfigurationName(std::string& value) const;
-  bool getDNSServerAddresses(std::vector<std::string>& values) const;
+  bool getBootProtocol(std::string& value);
+  bool getDomainName(std::string& value);
+  bool getRequestedHostname(std::string& value);
+  bool getConfigurationName(std::string& value);
+  bool getDNSServerAddresses(std::vector<std::string>& values);
 
-  bool getDHCPOptionsToUse(std::vector<unsigned short>& values) const;  // appended
-  bool getUseSuffixWhenRegistering(bool& value) const;                  // true, and leaves value as it is
-  bool getRegisterThisConnectionsAddress(bool& value) const;            // false
+  bool getDHCPOptionsToUse(std::vector<unsigned short>& values);  // appended
+  bool getUseSuffixWhenRegistering(bool& value);                  // true, and leaves value as it is
+  bool getRegisterThisConnectionsAddress(bool& value);            // false
 
   // Write to the node; true when it is stored there.
   bool setRequestedHostname(std::string value);

@@ -36,10 +36,10 @@ class DNSSettingDataTest : public ::testing::Test {
   World world_;
 };
 
-using Text = bool (DNSSettingData::*)(std::string&) const;
+using Text = bool (DNSSettingData::*)(std::string&);
 
 // What a getter says, with what its output holds: "before" where it was left as it was.
-std::pair<bool, std::string> get(const DNSSettingData& data, Text getter) {
+std::pair<bool, std::string> get(DNSSettingData data, Text getter) {
   std::string value = "before";
   const bool given = (data.*getter)(value);
   return {given, value};
@@ -187,7 +187,7 @@ TEST_F(DNSSettingDataTest, TheCursorStaysWhileItsSystemIsLookedUp) {
 // --- constants
 
 TEST_F(DNSSettingDataTest, CaptionDescriptionAndOriginAreConstants) {
-  const DNSSettingData data = atUsualNic();
+  DNSSettingData data = atUsualNic();
   EXPECT_EQ(std::pair(true, "DNS Setting Configuration"s), get(data, &DNSSettingData::getCaption));
   EXPECT_EQ(std::pair(true, "Represents DNS Setting Configuration for DNS Protocol EndPoint"s),
             get(data, &DNSSettingData::getDescription));
@@ -210,7 +210,7 @@ TEST_F(DNSSettingDataTest, DHCPOptionsAreAppendedBehindWhatIsThere) {
 }
 
 TEST_F(DNSSettingDataTest, UseOfTheSuffixIsGivenAndLeavesTheOutputAsItWas) {
-  const DNSSettingData data = atUsualNic();
+  DNSSettingData data = atUsualNic();
   for (const bool before : {false, true}) {
     bool value = before;
     EXPECT_TRUE(data.getUseSuffixWhenRegistering(value));
@@ -219,7 +219,7 @@ TEST_F(DNSSettingDataTest, UseOfTheSuffixIsGivenAndLeavesTheOutputAsItWas) {
 }
 
 TEST_F(DNSSettingDataTest, RegistrationOfTheAddressIsNeverGivenAndLeavesTheOutputAsItWas) {
-  const DNSSettingData data = atUsualNic();
+  DNSSettingData data = atUsualNic();
   for (const bool before : {false, true}) {
     bool value = before;
     EXPECT_FALSE(data.getRegisterThisConnectionsAddress(value));
@@ -287,7 +287,7 @@ TEST_P(ScalarSource, IsNothingWhereTheNodeLacksItToo) {
 
 TEST_P(ScalarSource, OfTheFileIsTold) {
   world_.file("eth0", kAllKeys);
-  const DNSSettingData data = atUsualNic();
+  DNSSettingData data = atUsualNic();
   const RecordingLogger logger;
   get(data, GetParam().getter);
   const LogLines lines = logger.pairs();
@@ -296,7 +296,7 @@ TEST_P(ScalarSource, OfTheFileIsTold) {
 }
 
 TEST_P(ScalarSource, OfTheNodeIsNotTold) {
-  const DNSSettingData data = atUsualNic();
+  DNSSettingData data = atUsualNic();
   const RecordingLogger logger;
   get(data, GetParam().getter);
   EXPECT_EQ(0U, logger.size());
@@ -308,7 +308,7 @@ INSTANTIATE_TEST_SUITE_P(DNSSettingData, ScalarSource, ::testing::ValuesIn(kScal
 class ServerSource : public DNSSettingDataTest {
  protected:
   std::pair<bool, std::vector<std::string>> servers() {
-    const DNSSettingData data = at(0);
+    DNSSettingData data = at(0);
     std::vector<std::string> values;
     const bool given = data.getDNSServerAddresses(values);
     return {given, values};
@@ -346,7 +346,7 @@ TEST_F(ServerSource, LeavesNothingOfWhatWasThereWhereTheNodeLacksItToo) {
 
 TEST_F(ServerSource, IsNotTold) {
   world_.nic("eth0").file("eth0", kAllKeys);
-  const DNSSettingData data = at(0);
+  DNSSettingData data = at(0);
   const RecordingLogger logger;
   std::vector<std::string> values;
   data.getDNSServerAddresses(values);

@@ -1,25 +1,31 @@
 #!/usr/bin/env bash
-# Compiles the library's five folders, unchanged, against copies of the two folders of headers that another vendor's may
-# take the place of, and looks that nothing came from the originals.
+# Compiles the library's five folders, unchanged, against other folders of headers, and looks that nothing came from the
+# project's own.
 #
-# usage: other_headers_test.sh SOURCE-DIR WORK-DIR C-COMPILER C++-COMPILER
+# usage: other_headers_test.sh SOURCE-DIR WORK-DIR HEADERS C-COMPILER C++-COMPILER
+# HEADERS is "copied" for copies of the project's own, "other" for another vendor's agent and CMPI 2.1.
 # Exits 77 where the compiler is not there.
 set -euo pipefail
 
 source=$1
-work=$2/$(basename "$4")
-for compiler in "$3" "$4"; do
+headers=$3
+work=$2/$headers-$(basename "$5")
+for compiler in "$4" "$5"; do
   command -v "$compiler" >/dev/null || { echo "skipped: there is no $compiler"; exit 77; }
 done
 
+rm -rf "${work:?}/headers"
 mkdir -p "$work/headers"
-for folder in agent/interface cmpi; do
-  rm -rf "${work:?}/headers/$(basename "$folder")"
-  cp -Rp "$source/$folder" "$work/headers/$(basename "$folder")"
-done
+if [ "$headers" = other ]; then
+  cp -Rp "$source/tests/loading/other_agent" "$work/headers/interface"
+  python3 "$source/tests/loading/make_cmpi_2_1.py" "$source/cmpi" "$work/headers/cmpi"
+else
+  cp -Rp "$source/agent/interface" "$work/headers/interface"
+  cp -Rp "$source/cmpi" "$work/headers/cmpi"
+fi
 
 cmake -S "$source" -B "$work/build" -G Ninja -DCMAKE_BUILD_TYPE=Debug -DZORVA_BUILD_TESTS=OFF \
-  -DCMAKE_C_COMPILER="$3" -DCMAKE_CXX_COMPILER="$4" \
+  -DCMAKE_C_COMPILER="$4" -DCMAKE_CXX_COMPILER="$5" \
   -DZORVA_AGENT_INCLUDE_DIR="$work/headers/interface" -DZORVA_CMPI_INCLUDE_DIR="$work/headers/cmpi"
 cmake --build "$work/build" --target zorva_model zorva_settings zorva_factory zorva_providers
 
@@ -30,6 +36,6 @@ if grep -E "^ +$source/(agent|cmpi|broker|schema|host|cli|server|cimxml)/" <<<"$
   exit 1
 fi
 for header in interface/Instrumentation.h cmpi/cmpift.h; do
-  grep -q "$work/headers/$header" <<<"$used" || { echo "$header: the copy was not used"; exit 1; }
+  grep -q "$work/headers/$header" <<<"$used" || { echo "$header: the other one was not used"; exit 1; }
 done
-echo "$(grep -c '\.o:' <<<"$used") sources compiled with $4"
+echo "$(grep -c '\.o:' <<<"$used") sources compiled with $5"
