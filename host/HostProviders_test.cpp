@@ -127,6 +127,15 @@ TEST_F(HostProviders, KeysMatchAsCimDoes) {
   EXPECT_EQ(systems_.getInstance(path.key("Name", uint16(1))).rc, CMPI_RC_ERR_NOT_FOUND);
 }
 
+TEST_F(HostProviders, AKeyIsThereByItsValueWhateverItsStateSays) {
+  const Path path = Path("ZORVA_ComputerSystem").key("Name", "host1").key("CreationClassName", "ZORVA_ComputerSystem");
+  for (const auto state : std::initializer_list<CMPIValueState>{CMPI_nullValue, CMPI_keyValue, CMPI_badValue}) {
+    broker_.addToAllStates(state);
+    EXPECT_THAT(systems_.getInstance(path).instances(), SizeIs(1)) << state;
+    EXPECT_EQ(systems_.getInstance(path.key("Name", null(CMPI_string))).rc, CMPI_RC_ERR_NOT_FOUND) << state;
+  }
+}
+
 TEST_F(HostProviders, APropertyListIsHonoured) {
   const Outcome outcome = systems_.enumerateInstances(Path("ZORVA_ComputerSystem"), {"enabledstate"});
   ASSERT_THAT(outcome.instances(), SizeIs(1));

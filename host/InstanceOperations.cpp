@@ -132,8 +132,8 @@ bool hasKeysOf(const HostObject& object, const CMPIObjectPath* ref) {
   for (const HostProperty& key : object.keys) {
     CMPIStatus status = kOk;
     const CMPIData data = ref->ft->getKey(ref, key.name, &status);
-    if (status.rc != CMPI_RC_OK || (data.state & CMPI_nullValue) != 0) return false;
-    if (data.type != CMPI_string && data.type != CMPI_chars) return false;
+    if (status.rc != CMPI_RC_OK || (data.type != CMPI_string && data.type != CMPI_chars)) return false;
+    if (data.type == CMPI_chars && data.value.chars == nullptr) return false;
     const std::string asked = data.type == CMPI_chars ? data.value.chars : textOf(data.value.string);
     const std::string& own = std::get<std::string>(key.value);
     const bool equal = namesAClass(key.name) ? strcasecmp(asked.c_str(), own.c_str()) == 0 : asked == own;
