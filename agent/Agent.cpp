@@ -39,6 +39,8 @@ void loadConfig(const std::string& path) {
   Runtime::instance().useConfig(path.empty() ? readDefaultConfig() : readConfig(path));
 }
 
+void askForExceptions() { Runtime::instance().askForExceptions(); }
+
 const Config& currentConfig() {
   Runtime::instance().checkConfig();
   return Runtime::instance().config();

@@ -19,6 +19,11 @@ namespace zorvagent {
 // holds in the whole process from now on. Throws ConfigError, and what held before stays.
 ZORVA_AGENT_API void loadConfig(const std::string& path = {});
 
+// Lets a cursor (ZV::Instrumentation) throw where the configuration or the tree cannot be read, as the functions here
+// do: for programs that catch what a provider throws. Without it such a cursor is placed on no node, with a line to the
+// log and, once in a process, to syslog: a server that is written in C does not survive an exception.
+ZORVA_AGENT_API void askForExceptions();
+
 // The configuration that holds; it is read from where the environment says where nobody has loaded one. Valid until
 // the library is unloaded. Throws ConfigError where that is wrong.
 ZORVA_AGENT_API const Config& currentConfig();

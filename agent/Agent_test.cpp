@@ -94,9 +94,10 @@ TEST_F(AgentTest, ASourceThatThrowsAnythingLeavesTheKernelsName) {
   EXPECT_EQ(getSystemName(), kernelName());
 }
 
-TEST_F(AgentTest, AWrongConfigurationReachesSelectNodeAsOneLineAndEverythingElseGoesOn) {
+TEST_F(AgentTest, AWrongConfigurationReachesSelectNodeOfAProgramThatAskedAsOneLineAndEverythingElseGoesOn) {
   ::setenv("ZORVAGENT_CONFIG", directory_.write("agent.toml", "[agent]\nlangauge = \"en\"\n").c_str(), 1);
   const std::string expected = directory_ / "agent.toml:2: agent.langauge: is not a known key";
+  askForExceptions();
   ::testing::internal::CaptureStderr();
   for (int i = 0; i < 2; ++i) {
     try {

@@ -2,6 +2,7 @@
 
 #include <pthread.h>
 #include <sys/utsname.h>
+#include <syslog.h>
 #include <unistd.h>
 
 #include <stdexcept>
@@ -141,6 +142,39 @@ std::shared_ptr<const TreeSnapshot> Runtime::latest() {
   return look();
 }
 
+std::shared_ptr<const TreeSnapshot> Runtime::lookForCursor() {
+  if (throws_) return look();
+  const std::lock_guard lock(lookMutex_);
+  try {
+    auto tree = lookAndRead();
+    reported_.clear();
+    return tree;
+  } catch (const std::exception& error) {
+    reportOnce(std::string("the tree cannot be read: ") + error.what());
+  } catch (...) {
+    reportOnce("the tree cannot be read");
+  }
+  return nullptr;
+}
+
+// A server asks again with every request.
+void Runtime::reportOnce(const std::string& problem) {
+  if (problem == reported_) return;
+  reported_ = problem;
+  ZORVAGENT_LOG_ERROR(problem);
+  if (syslogIsInformed_) return;
+  syslogIsInformed_ = true;
+  ::syslog(LOG_DAEMON | LOG_ERR, "zorvagent: %s", problem.c_str());
+}
+
+std::shared_ptr<const TreeSnapshot> Runtime::latestForCursor() {
+  {
+    const std::lock_guard lock(latestMutex_);
+    if (latest_ != nullptr) return latest_;
+  }
+  return lookForCursor();
+}
+
 std::string Runtime::systemName() {
   const LoadedConfig& loaded = loadedConfig();
   if (!loaded.config.systemName.empty()) return loaded.config.systemName;
@@ -148,8 +182,8 @@ std::string Runtime::systemName() {
   try {
     // Of the tree that the latest cursor was placed in: a name is told many times in one operation, and must not change
     // on the way.
-    const std::shared_ptr<const TreeSnapshot> tree = latest();
-    return tree->systemName().empty() ? kernelName() : tree->systemName();
+    const std::shared_ptr<const TreeSnapshot> tree = latestForCursor();
+    return tree == nullptr || tree->systemName().empty() ? kernelName() : tree->systemName();
   } catch (...) {
     return kernelName();
   }
@@ -207,6 +241,9 @@ void Runtime::forgetTree() {
 
 void Runtime::reset() {
   const std::lock_guard lock(lookMutex_);
+  throws_ = false;
+  reported_.clear();
+  syslogIsInformed_ = false;
   sourceIsGiven_ = false;
   source_ = nullptr;
   loadedConfig_.store(nullptr, std::memory_order_release);

@@ -40,6 +40,12 @@ class Runtime {
   // The tree as it was at the last look; looks where there was none.
   std::shared_ptr<const TreeSnapshot> latest();
 
+  // The same two for a cursor, which throw only where a program has asked for exceptions. Otherwise null where the tree
+  // cannot be read, with a line to the log whenever the reason is another one, and the first one to syslog.
+  std::shared_ptr<const TreeSnapshot> lookForCursor();
+  std::shared_ptr<const TreeSnapshot> latestForCursor();
+  void askForExceptions() { throws_ = true; }
+
   // The system's name. Never throws but std::bad_alloc.
   std::string systemName();
 
@@ -63,10 +69,13 @@ class Runtime {
 
   const LoadedConfig& loadedConfig();
   std::shared_ptr<const TreeSnapshot> lookAndRead();
+  void reportOnce(const std::string& problem);
   void followFork();
   void forgetTree();
   void holdStill();
   void goOn();
+
+  std::atomic<bool> throws_ = false;
 
   std::mutex configMutex_;
   std::deque<LoadedConfig> configs_;  // the last one holds; earlier ones stay for those who point at them
@@ -80,6 +89,8 @@ class Runtime {
   std::shared_ptr<const TreeSnapshot> sourceTree_;  // null: to be read again
   bool overlayStale_ = true;
   bool latestStale_ = true;
+  std::string reported_;           // the problem of the last look for a cursor; empty where it went well
+  bool syslogIsInformed_ = false;  // of the first one
 
   std::mutex latestMutex_;  // taken within lookMutex_, never the other way round
   std::shared_ptr<const TreeSnapshot> latest_;

@@ -46,7 +46,8 @@ class TreeCallHook {
 // Asks the hook at every call of a cursor, until null is given. The hook stays the caller's. Thread-safe.
 ZORVA_AGENT_API void setTreeCallHook(TreeCallHook* hook);
 
-// Forgets everything that this process knows: configuration, source, snapshot, sinks, hook. The next call starts as in
+// Forgets everything that this process knows: configuration, source, snapshot, sinks, hook, and that a program has
+// asked for exceptions. The next call starts as in
 // a new process. Cursors that exist stay valid.
 ZORVA_AGENT_API void reset();
 

@@ -2,6 +2,7 @@
 #include <exception>
 #include <variant>
 
+#include "agent/Agent.h"
 #include "cli/Arguments.h"
 #include "cli/Failure.h"
 #include "cli/Session.h"
@@ -26,6 +27,7 @@ ExitCode run(int argc, const char* const* argv) {
 }  // namespace
 
 int main(int argc, char** argv) {
+  zorvagent::askForExceptions();
   try {
     return static_cast<int>(run(argc, argv));
   } catch (const Failure& failure) {

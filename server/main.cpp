@@ -1,3 +1,7 @@
+#include "agent/Agent.h"
 #include "server/Daemon.h"
 
-int main(int argc, char** argv) { return zorva::server::runServer(argc, argv, zorva::server::makeBuiltInBroker); }
+int main(int argc, char** argv) {
+  zorvagent::askForExceptions();
+  return zorva::server::runServer(argc, argv, zorva::server::makeBuiltInBroker);
+}

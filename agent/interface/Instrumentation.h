@@ -14,8 +14,9 @@ namespace ZV {
 // same snapshot and moves on its own. One cursor belongs to one thread; different cursors may be used from different
 // threads at the same time.
 //
-// Texts are bytes as the host gives them, UTF-8 by convention. Every operation may throw an exception derived from
-// std::exception: when the tree cannot be read (its what() tells why) or when memory runs out.
+// Texts are bytes as the host gives them, UTF-8 by convention. Every operation may throw std::bad_alloc. Where the tree
+// cannot be read, selectNode places the cursor on no node and the agent's log has the reason; in a program that has
+// asked for exceptions it throws one derived from std::exception, and the cursor stays where it was.
 class ZORVA_AGENT_API Instrumentation {
  public:
   // A cursor that stands on no node.

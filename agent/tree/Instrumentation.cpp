@@ -55,8 +55,13 @@ Instrumentation::~Instrumentation() = default;
 
 void Instrumentation::selectNode(NodeLexicon::NodeType type) {
   announce(TreeCall::SelectByType);
+  auto snapshot = Runtime::instance().lookForCursor();
+  if (snapshot == nullptr) {
+    position_ = nullptr;
+    return;
+  }
   auto position = std::make_unique<Position>();
-  position->snapshot = Runtime::instance().look();
+  position->snapshot = std::move(snapshot);
   // The other types of nodes have numbers of the agent's own, which are no numbers of this enumeration.
   if (type == NodeLexicon::NODE_NETWORK_IP_CONFIG) {
     position->node = position->snapshot->nextOfType(NodeType::NetworkIPConfig, 0);
@@ -68,7 +73,8 @@ void Instrumentation::selectNode(NodeLexicon::NodeType type) {
 void Instrumentation::selectNode(const std::string& path) {
   announce(TreeCall::SelectByPath);
   if (position_ == nullptr) {
-    auto snapshot = Runtime::instance().latest();
+    auto snapshot = Runtime::instance().latestForCursor();
+    if (snapshot == nullptr) return;
     position_ = std::make_unique<Position>();
     position_->snapshot = std::move(snapshot);
   }

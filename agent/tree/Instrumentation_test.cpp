@@ -1,16 +1,20 @@
 #include "agent/interface/Instrumentation.h"
 
-#include <gtest/gtest.h>
+#include <gmock/gmock.h>
 
+#include <sstream>
 #include <stdexcept>
 
 #include "agent/Agent.h"
 #include "agent/Seams.h"
+#include "agent/interface/PlatformUtilities.h"
 #include "agent/testing/TemporaryDirectory.h"
 
 namespace {
 
 using namespace ZV::NodeLexicon;
+using ::testing::ElementsAre;
+using ::testing::SizeIs;
 using zorvagent::TreeCall;
 using ZV::Instrumentation;
 
@@ -171,18 +175,57 @@ TEST_F(InstrumentationTest, ACursorStaysInItsSnapshotWhenTheTreeChanges) {
   EXPECT_FALSE(fresh) << "a cursor without a snapshot uses the latest one";
 }
 
-TEST_F(InstrumentationTest, ASourceThatThrowsLeavesTheCursorWhereItWas) {
-  struct Failing : zorvagent::TreeSource {
-    bool changed() override { return true; }
-    std::shared_ptr<const zorvagent::TreeSnapshot> read() override { throw std::runtime_error("no kernel"); }
-  };
+struct FailingSource : zorvagent::TreeSource {
+  bool changed() override { return true; }
+  std::shared_ptr<const zorvagent::TreeSnapshot> read() override {
+    if (problem.empty()) throw 42;
+    throw std::runtime_error(problem);
+  }
+  std::string problem = "no kernel";
+};
+
+TEST_F(InstrumentationTest, ASourceThatThrowsLeavesTheCursorWhereItWasWhereAProgramAskedForThat) {
+  zorvagent::askForExceptions();
   Instrumentation cursor;
   cursor.selectNode(NODE_NETWORK_IP_CONFIG);
-  zorvagent::setTreeSource(std::make_shared<Failing>());
+  zorvagent::setTreeSource(std::make_shared<FailingSource>());
   EXPECT_THROW(cursor.selectNode(NODE_NETWORK_IP_CONFIG), std::runtime_error);
   EXPECT_EQ(nameAt(cursor), "eth0");
   EXPECT_NE(zorvagent::testing::contentsOf(directory_ / "log").find("the tree cannot be read: no kernel"),
             std::string::npos);
+}
+
+TEST_F(InstrumentationTest, ASourceThatThrowsElsePlacesTheCursorOnNoNodeAndLogsEachReasonOnce) {
+  const auto source = std::make_shared<FailingSource>();
+  Instrumentation cursor;
+  cursor.selectNode(NODE_NETWORK_IP_CONFIG);
+  const auto expectNone = [&] {
+    cursor.selectNode(NODE_NETWORK_IP_CONFIG);
+    EXPECT_FALSE(cursor);
+    cursor.selectNode("/system/eth0/ip");
+    EXPECT_FALSE(cursor);
+    EXPECT_NE(ZV::getSystemName(), "");
+  };
+  const auto logged = [this] {
+    std::vector<std::string> reasons;
+    std::istringstream log(zorvagent::testing::contentsOf(directory_ / "log"));
+    for (std::string line; std::getline(log, line);) reasons.push_back(line.substr(line.find("cannot be read")));
+    return reasons;
+  };
+  zorvagent::setTreeSource(source);
+  expectNone();
+  expectNone();
+  EXPECT_THAT(logged(), ElementsAre("cannot be read: no kernel"));
+  source->problem = "";
+  expectNone();
+  EXPECT_THAT(logged(), ElementsAre("cannot be read: no kernel", "cannot be read"));
+
+  install(kTwoInterfaces);
+  cursor.selectNode(NODE_NETWORK_IP_CONFIG);
+  EXPECT_EQ(nameAt(cursor), "eth0");
+  zorvagent::setTreeSource(source);
+  expectNone();
+  EXPECT_THAT(logged(), SizeIs(3)) << "after it went well once the same reason is news";
 }
 
 TEST_F(InstrumentationTest, AHookIsAskedAtEveryCallAndWhatItThrowsLeavesTheCall) {

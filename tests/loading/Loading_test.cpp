@@ -1,9 +1,14 @@
 // The library in a process that is not its own: beside another that has all its names, loaded and unloaded again and
-// again, and used by two brokers.
+// again, used by two brokers, and over an agent that cannot work.
 #include <dlfcn.h>
+#include <fcntl.h>
 #include <gmock/gmock.h>
 #include <malloc.h>
+#include <unistd.h>
 
+#include <cstdarg>
+#include <cstdio>
+#include <cstdlib>
 #include <fstream>
 #include <iostream>
 #include <memory>
@@ -15,9 +20,37 @@
 #include "schema/Schema.h"
 #include "tests/faults/LiveMemory.h"
 
+namespace {
+
+std::vector<std::string> syslogLines;
+
+void takeSyslogLine(const char* format, va_list arguments) {
+  char line[1024];
+  std::vsnprintf(line, sizeof line, format, arguments);
+  syslogLines.emplace_back(line);
+}
+
+}  // namespace
+
+// In the place of the C library's, for every library in this process; the second is what a fortified build calls.
+extern "C" __attribute__((visibility("default"), format(printf, 2, 3))) void syslog(int, const char* format, ...) {
+  va_list arguments;
+  va_start(arguments, format);
+  takeSyslogLine(format, arguments);
+  va_end(arguments);
+}
+extern "C" __attribute__((visibility("default"), format(printf, 3, 4))) void __syslog_chk(int, int, const char* format,
+                                                                                          ...) {
+  va_list arguments;
+  va_start(arguments, format);
+  takeSyslogLine(format, arguments);
+  va_end(arguments);
+}
+
 namespace ZV::Test {
 namespace {
 
+using ::testing::ElementsAre;
 using ::testing::HasSubstr;
 
 std::string everythingAlone() {
@@ -100,6 +133,78 @@ TEST(LoadCycles, AHundredLeaveNothingBehind) {
   EXPECT_EQ(before.files, after.files);
   EXPECT_LT(after.heapBytes, before.heapBytes + kSlack);
   EXPECT_EQ(nullptr, ::dlopen(providerLibraryPath().c_str(), RTLD_NOW | RTLD_NOLOAD));
+}
+
+// --- An agent that cannot work.
+
+// What a process of a server that has asked for nothing sees of a host whose agent has those files: the end of each
+// enumeration of the setting data, the lines on standard error, and those for syslog.
+struct Seen {
+  std::vector<std::string> ends;
+  std::vector<std::string> logged;
+  std::vector<std::string> syslogged;
+};
+
+std::vector<std::string> linesOf(const std::string& path) {
+  std::vector<std::string> lines;
+  std::ifstream in(path);
+  for (std::string line; std::getline(in, line);) lines.push_back(line);
+  return lines;
+}
+
+Seen enumerateTwice(const zorvagent::testing::TemporaryDirectory& directory) {
+  ::setenv("ZORVAGENT_CONFIG", (directory / "agent.toml").c_str(), 1);
+  const int standardError = ::dup(STDERR_FILENO);
+  const int file = ::open((directory / "stderr").c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600);
+  ::dup2(file, STDERR_FILENO);
+  ::close(file);
+  syslogLines.clear();
+  Seen seen;
+  {
+    RecordingBroker broker;
+    const Library library(providerLibraryPath(), RTLD_LOCAL);
+    const auto create = library.find<InstanceProvider::Create>("DNSSettingDataProvider_Create_InstanceMI");
+    InstanceProvider provider(create, broker);
+    for (int i = 0; i < 2; ++i) {
+      try {
+        const Outcome outcome = provider.enumerateInstances(Path("ZORVA_DNSSettingData"));
+        seen.ends.push_back(std::string(nameOf(outcome.rc)) + (outcome.done() ? " done, " : " open, ") +
+                            std::to_string(outcome.instances().size()));
+      } catch (const std::exception& error) {
+        seen.ends.push_back(std::string("an exception: ") + error.what());
+      }
+    }
+    askEverything(library, broker);
+  }
+  ::dup2(standardError, STDERR_FILENO);
+  ::close(standardError);
+  ::unsetenv("ZORVAGENT_CONFIG");
+  seen.logged = linesOf(directory / "stderr");
+  std::erase_if(seen.logged,
+                [](const std::string& line) { return line.find(" Zorvagent.Agent ") == std::string::npos; });
+  seen.syslogged = syslogLines;
+  return seen;
+}
+
+TEST(PlainLoader, AWrongConfigurationIsAnEmptyEnumerationWithALineToTheLogAndToSyslog) {
+  const zorvagent::testing::TemporaryDirectory directory;
+  directory.write("agent.toml", "[agent]\nlangauge = \"en\"\n");
+  const Seen seen = enumerateTwice(directory);
+  const std::string reason = directory / "agent.toml:2: agent.langauge: is not a known key";
+  EXPECT_THAT(seen.ends, ElementsAre("CMPI_RC_OK done, 0", "CMPI_RC_OK done, 0"));
+  EXPECT_THAT(seen.logged, ElementsAre(HasSubstr("the tree cannot be read: " + reason)));
+  EXPECT_THAT(seen.syslogged, ElementsAre("zorvagent: the tree cannot be read: " + reason));
+}
+
+TEST(PlainLoader, ATreeThatCannotBeReadIsAnEmptyEnumerationWithALineToTheLogAndToSyslog) {
+  const zorvagent::testing::TemporaryDirectory directory;
+  directory.write("agent.toml", "[tree]\nsource = \"file\"\nfile = \"tree.json\"\n");
+  directory.write("tree.json", "{\n\"system\": 1}");
+  const Seen seen = enumerateTwice(directory);
+  const std::string reason = directory / "tree.json:2: system: is not a known key";
+  EXPECT_THAT(seen.ends, ElementsAre("CMPI_RC_OK done, 0", "CMPI_RC_OK done, 0"));
+  EXPECT_THAT(seen.logged, ElementsAre(HasSubstr(reason)));
+  EXPECT_THAT(seen.syslogged, ElementsAre(HasSubstr(reason)));
 }
 
 // --- Brokers.

@@ -66,9 +66,11 @@ void setProperties(TreeBuilder& builder, std::size_t node, const std::string& na
   }
 }
 
-// The agent as in a new process; a logger that records goes on recording.
+// The agent as in a new process of a program that catches what a provider throws; a logger that records goes on
+// recording.
 void forgetWorld() {
   zorvagent::reset();
+  zorvagent::askForExceptions();
   if (RecordingLogger* logger = RecordingLogger::active()) logger->resume();
 }
 
