@@ -153,7 +153,6 @@ Status Broker::createInstance(const Instance& instance, ObjectPath& created, con
     PathObject* name = nullptr;
     InstanceObject* object = nullptr;
     Status status = makePath(request.arena(), instance.path, true, name);
-    if (status.ok()) status = refuseControlCharacters(instance, std::nullopt);
     if (status.ok()) status = makeInstance(request.arena(), *name, instance, object);
     if (!status.ok()) return status;
     OneTaker taker(nullptr, &created);

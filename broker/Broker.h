@@ -146,7 +146,7 @@ class Broker {
   /// where that is all the provider is not called. Before anything is written, these are refused: a listed name that
   /// the class lacks, and a key with another value than in the path (CIM_ERR_INVALID_PARAMETER); another value for a
   /// property without the qualifier Write (CIM_ERR_NOT_SUPPORTED). `effect`, where it is not null, gets what came of
-  /// it. A control character other than tab in a text, here and in createInstance and invokeMethod, is
+  /// it. A control character other than tab in a text, here and in invokeMethod, is
   /// CIM_ERR_INVALID_PARAMETER.
   Status modifyInstance(const Instance& instance, const std::optional<std::vector<std::string>>& propertyList,
                         const Caller& caller = {}, ModificationEffect* effect = nullptr);

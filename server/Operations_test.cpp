@@ -220,6 +220,22 @@ TEST_F(OperationsTest, SetPropertyChangesOneProperty) {
   EXPECT_THAT(errorOf("SetProperty", what + text("NewValue", "many")), HasSubstr("13 T_Thing.Size"));
 }
 
+TEST_F(OperationsTest, TextsWithControlCharactersReachNoProvider) {
+  const std::string modified = "<VALUE.NAMEDINSTANCE>" + thing("a") +
+                               "<INSTANCE CLASSNAME=\"T_Thing\"><PROPERTY.ARRAY NAME=\"Labels\" "
+                               "TYPE=\"string\"><VALUE.ARRAY><VALUE>x&#10;CONFIG=y"
+                               "</VALUE></VALUE.ARRAY></PROPERTY.ARRAY></INSTANCE></VALUE.NAMEDINSTANCE>";
+  EXPECT_THAT(errorOf("ModifyInstance", parameter("ModifiedInstance", modified)),
+              HasSubstr("4 the property Labels has the control character U+000A"));
+  EXPECT_THAT(errorOf("SetProperty", parameter("InstanceName", thing("a")) + text("PropertyName", "Labels") +
+                                         names("NewValue", {"x&#13;"})),
+              HasSubstr("4 the property Labels has the control character U+000D"));
+  EXPECT_THAT(
+      invoke("Echo", thing("a"), "<PARAMVALUE NAME=\"Text\" PARAMTYPE=\"string\"><VALUE>a&#127;</VALUE></PARAMVALUE>"),
+      HasSubstr("<ERROR CODE=\"4\" DESCRIPTION=\"the parameter Text has the control character U+007F"));
+  EXPECT_THAT(service_.lines(), Not(Contains(HasSubstr("ModifyInstance root/cimv2:T_Thing"))));
+}
+
 // Associations.
 
 TEST_F(OperationsTest, AssociatorsGivesInstancesWithTheirWholePaths) {
