@@ -76,7 +76,7 @@ TEST_F(ModificationTest, HandsOverTheCurrentValuesOfWhatIsNotGiven) {
 
 TEST_F(ModificationTest, HandsOverTheCurrentValuesOfWhatIsNotListed) {
   expectHanded(modify({size(8), labels({"z"})}, {{"LABELS"}}), "[Labels] Size 7 Labels z");
-  expectHanded(modify({size(9)}, {{"Size", "Labels"}}), "[Size Labels] Size 9 Labels x y");
+  expectHanded(modify({size(9)}, {{"Size", "Labels"}}), "[Size Labels] Size 9 Labels z");
 }
 
 TEST_F(ModificationTest, LeavesOutWhatTheProviderKeepsAnyway) {

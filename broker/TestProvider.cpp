@@ -1,6 +1,8 @@
 #include <atomic>
+#include <mutex>
 #include <stdexcept>
 #include <string>
+#include <vector>
 
 #include "cmpidt.h"
 #include "cmpift.h"
@@ -63,6 +65,16 @@ CMPIObjectPath* pathOf(const CMPIObjectPath* like, const char* className, const 
   return path;
 }
 
+void setLabels(CMPIInstance* instance, const std::vector<std::string>& labels) {
+  const auto count = static_cast<CMPICount>(labels.size());
+  CMPIValue value;
+  value.array = broker()->eft->newArray(broker(), count, CMPI_chars, nullptr);
+  for (CMPICount i = 0; i < count; ++i) {
+    value.array->ft->setElementAt(value.array, i, reinterpret_cast<const CMPIValue*>(labels[i].c_str()), CMPI_chars);
+  }
+  instance->ft->setProperty(instance, "Labels", &value, CMPI_charsA);
+}
+
 CMPIInstance* instanceOf(const CMPIObjectPath* like, const char* className, const std::string& name,
                          const char** properties) {
   CMPIObjectPath* path =
@@ -75,22 +87,22 @@ CMPIInstance* instanceOf(const CMPIObjectPath* like, const char* className, cons
   instance->ft->setProperty(instance, "Extra", reinterpret_cast<const CMPIValue*>("more"), CMPI_chars);
   const CMPIUint16 size = 7;
   instance->ft->setProperty(instance, "Size", reinterpret_cast<const CMPIValue*>(&size), CMPI_uint16);
-  CMPIArray* labels = broker()->eft->newArray(broker(), 2, CMPI_chars, nullptr);
-  labels->ft->setElementAt(labels, 0, reinterpret_cast<const CMPIValue*>("x"), CMPI_chars);
-  labels->ft->setElementAt(labels, 1, reinterpret_cast<const CMPIValue*>("y"), CMPI_chars);
-  CMPIValue value;
-  value.array = labels;
-  instance->ft->setProperty(instance, "Labels", &value, CMPI_charsA);
+  setLabels(instance, {"x", "y"});
   return instance;
 }
 
 // What of the thing "a" can be modified, until the broker ends.
-constexpr int kNoSize = -1;
-constexpr int kFirstSize = 7;
-std::atomic<int> sizeOfA = kFirstSize;
+struct ThingA {
+  bool hasSize = true;
+  CMPIUint16 size = 7;
+  std::vector<std::string> labels = {"x", "y"};
+};
+std::mutex thingMutex;
+ThingA thingA;
 
 CMPIStatus cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
-  sizeOfA = kFirstSize;
+  const std::lock_guard lock(thingMutex);
+  thingA = ThingA();
   return kOk;
 }
 
@@ -98,10 +110,10 @@ CMPIStatus cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
 CMPIInstance* thingOf(const CMPIObjectPath* path, const std::string& name, const char** properties) {
   CMPIInstance* instance = instanceOf(path, "T_Thing", name, properties);
   if (name != "a") return instance;
-  const int stored = sizeOfA;
-  const auto size = static_cast<CMPIUint16>(stored);
-  instance->ft->setProperty(instance, "Size", stored == kNoSize ? nullptr : reinterpret_cast<const CMPIValue*>(&size),
-                            CMPI_uint16);
+  const std::lock_guard lock(thingMutex);
+  instance->ft->setProperty(instance, "Size",
+                            thingA.hasSize ? reinterpret_cast<const CMPIValue*>(&thingA.size) : nullptr, CMPI_uint16);
+  setLabels(instance, thingA.labels);
   return instance;
 }
 CMPIStatus associationCleanup(CMPIAssociationMI*, const CMPIContext*, CMPIBoolean) { return kOk; }
@@ -158,24 +170,31 @@ CMPIStatus create(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
   return kOk;
 }
 
-std::string labelsOf(const CMPIInstance* instance) {
+std::vector<std::string> labelsOf(const CMPIInstance* instance) {
+  std::vector<std::string> found;
   const CMPIData labels = instance->ft->getProperty(instance, "Labels", nullptr);
-  if ((labels.state & CMPI_nullValue) != 0) return "";
-  std::string shows = " Labels";
+  if ((labels.state & CMPI_nullValue) != 0) return found;
   const CMPICount count = labels.value.array->ft->getSize(labels.value.array, nullptr);
   for (CMPICount i = 0; i < count; ++i) {
-    shows += " " + text(labels.value.array->ft->getElementAt(labels.value.array, i, nullptr).value.string);
+    found.push_back(text(labels.value.array->ft->getElementAt(labels.value.array, i, nullptr).value.string));
   }
-  return shows;
+  return found;
 }
 
 CMPIStatus modify(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath* path,
                   const CMPIInstance* instance, const char** properties) {
   const CMPIData size = instance->ft->getProperty(instance, "size", nullptr);
   const bool hasSize = (size.state & CMPI_nullValue) == 0;
-  note("ModifyInstance " + shown(path) + " " + shown(properties) + " Size " +
-       (hasSize ? std::to_string(size.value.uint16) : "null") + labelsOf(instance));
-  if (nameOf(path) == "a") sizeOfA = hasSize ? size.value.uint16 : kNoSize;
+  const std::vector<std::string> labels = labelsOf(instance);
+  std::string line = "ModifyInstance " + shown(path) + " " + shown(properties) + " Size " +
+                     (hasSize ? std::to_string(size.value.uint16) : "null") + (labels.empty() ? "" : " Labels");
+  for (const std::string& label : labels) line += " " + label;
+  note(line);
+  if (nameOf(path) != "a") return kOk;
+  const std::lock_guard lock(thingMutex);
+  thingA.hasSize = hasSize;
+  if (hasSize) thingA.size = size.value.uint16;
+  if (!labels.empty()) thingA.labels = labels;
   return kOk;
 }
 
