@@ -8,6 +8,7 @@
 #include <cmpidt.h>
 #include <cmpift.h>
 
+#include <span>
 #include <string>
 #include <unordered_set>
 #include <vector>
@@ -91,6 +92,12 @@ void returnDone(const CMPIResult* result);
 template <typename Element>
 unsigned short count16(const std::vector<Element>& elements) {
   return static_cast<unsigned short>(elements.size());
+}
+
+// The elements that this count takes in.
+template <typename Element>
+std::span<const Element> counted16(const std::vector<Element>& elements) {
+  return {elements.data(), count16(elements)};
 }
 
 // Which properties of an instance a request asks for, by exact name. Without a list that is every one, or none where

@@ -2,347 +2,227 @@
 // computer systems are served elsewhere and asked for through the broker.
 //
 // A system's Name is compared with an endpoint's SystemName. The builder takes a part of the Name for a match too; the
-// names, the associators and the references want it whole; the associators of a system moreover leave out what hangs on
-// the service processor.
+// names, the associators and the references need the whole Name. The associators of a system also leave out the
+// endpoints of the service processor.
 #include <strings.h>
 
 #include "factory/DNSClientObjFactory.h"
-#include "providers/AssociationSteps.h"
+#include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"
 #include "providers/Results.h"
 
 namespace ZV {
 
-static const std::string loggerDNSHostAccessPoint = "Zorvagent.DNSHostedAccessPointProvider";
+static const std::string logCategory = "Zorvagent.DNSHostedAccessPointProvider";
 static const char* const computerSystemClass = "ZORVA_ComputerSystem";
 static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
 static const char* const dnsHostedAccessPointClass = "ZORVA_DNSHostedAccessPoint";
 
-static unsigned short DNSHostedAccessPointCMPIInstances(const CMPIObjectPath* ref, const char** properties,
-                                                        const CMPIContext* context,
-                                                        std::vector<CMPIInstance*>& instances) {
-  ZV_PROVIDER_ENTRY(loggerDNSHostAccessPoint);
-  CMPIStatus status = kStatusOk;
+static bool DNSHostedAccessPointCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
+                                              const char** properties, std::vector<CMPIInstance*>& instances) {
+  Operation operation = ZV_OPERATION(context, nullptr, ref);
   DNSClientObjFactory factory;
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* systemClass = newPath(broker, nameSpace, computerSystemClass, &status);
-  if (isMissing(systemClass, loggerDNSHostAccessPoint, ZV_HERE, "Create CMPIObjectPath failed for ComputerSystem.")) {
-    return 1;
-  }
-  const CMPIEnumeration* systems = enumerateInstanceNames(broker, context, systemClass, &status);
-  if (status.rc != CMPI_RC_OK) {
-    logError(loggerDNSHostAccessPoint, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-    return 1;
-  }
-  while (hasNext(systems, &status)) {
-    const CMPIObjectPath* system = nextPath(systems, &status);
-    const std::string name = keyText(system, "Name", &status);
+  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  CMPIObjectPath* systemClass = newPath(broker, nameSpace, computerSystemClass, &operation.status);
+  if (isMissing(operation, systemClass, "Create CMPIObjectPath failed for ComputerSystem.")) return false;
+  const CMPIEnumeration* systems = nullptr;
+  if (!askForNames(operation, systemClass, systems)) return false;
+  while (hasNext(systems, &operation.status)) {
+    const CMPIObjectPath* system = nextPath(systems, &operation.status);
+    const std::string name = keyText(system, "Name", &operation.status);
     std::vector<CMPIObjectPath*> endpoints;
-    endpoints.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIObjPaths(broker, ref, endpoints, &status) != 0) {
-      logError(loggerDNSHostAccessPoint, ZV_HERE,
-               "***Can't get DNS Client ObjectPaths.                 Exiting EnumerateInstanceNames***");
-      return 1;
+    if (!fetchEndpoints(operation, factory, ref, endpoints)) {
+      return complain(operation,
+                      "***Can't get DNS Client ObjectPaths.                 Exiting EnumerateInstanceNames***");
     }
-    for (unsigned short i = 0; i < count16(endpoints); ++i) {
-      CMPIObjectPath* endpoint = endpoints.at(i);
-      if (isMissing(endpoint, loggerDNSHostAccessPoint, ZV_HERE, "CMPIObjectPath is NULL for DNS Client")) return 1;
-      if (name.find(keyText(endpoint, "SystemName", &status)) == std::string::npos) continue;  // a part will do
+    for (CMPIObjectPath* endpoint : counted16(endpoints)) {
+      if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Client")) return false;
+      if (name.find(keyText(endpoint, "SystemName", &operation.status)) == std::string::npos) continue;
       setNameSpace(endpoint, nameSpace);
-      CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsHostedAccessPointClass, &status);
-      if (isMissing(path, loggerDNSHostAccessPoint, ZV_HERE,
+      CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsHostedAccessPointClass, &operation.status);
+      if (isMissing(operation, path,
                     "Create CMPIObjectPath failed for                     dnsHostedAccessPointClass.")) {
-        return 1;
+        return false;
       }
-      CMPIInstance* instance = newInstance(broker, path, &status);
-      if (isGood(instance)) {
-        setPropertyFilter(instance, properties, {"Antecedent", "Dependent"});
-        setReference(instance, "Antecedent", system);
-        setReference(instance, "Dependent", endpoint);
-      }
+      CMPIInstance* instance = newInstance(broker, path, &operation.status);
+      setPropertyFilter(instance, properties, {"Antecedent", "Dependent"});
+      setPair(instance, "Antecedent", system, "Dependent", endpoint);
       instances.push_back(instance);  // good or not
     }
   }
-  ZV_PROVIDER_EXIT(loggerDNSHostAccessPoint);
-  return 0;
+  markExit(operation);
+  return true;
 }
 
 // Delivers each path at once: a failure further on leaves what went out, and the result open.
 static CMPIStatus DNSHostedAccessPoint_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                          const CMPIResult* result, const CMPIObjectPath* ref) {
-  ZV_PROVIDER_ENTRY(loggerDNSHostAccessPoint);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* systemClass = newPath(broker, nameSpace, computerSystemClass, &status);
-  if (isMissing(systemClass, loggerDNSHostAccessPoint, ZV_HERE, "Create CMPIObjectPath failed for ComputerSystem.")) {
-    return status;
-  }
-  const CMPIEnumeration* systems = enumerateInstanceNames(broker, context, systemClass, &status);
-  if (status.rc != CMPI_RC_OK) {
-    logError(loggerDNSHostAccessPoint, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-    return status;
-  }
-  while (hasNext(systems, &status)) {
-    const CMPIObjectPath* system = nextPath(systems, &status);
-    const std::string name = keyText(system, "Name", &status);
+  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  CMPIObjectPath* systemClass = newPath(broker, nameSpace, computerSystemClass, &operation.status);
+  if (isMissing(operation, systemClass, "Create CMPIObjectPath failed for ComputerSystem.")) return operation.status;
+  const CMPIEnumeration* systems = nullptr;
+  if (!askForNames(operation, systemClass, systems)) return operation.status;
+  while (hasNext(systems, &operation.status)) {
+    const CMPIObjectPath* system = nextPath(systems, &operation.status);
+    const std::string name = keyText(system, "Name", &operation.status);
     std::vector<CMPIObjectPath*> endpoints;
-    endpoints.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIObjPaths(broker, ref, endpoints, &status) != 0) {
-      logError(loggerDNSHostAccessPoint, ZV_HERE,  // one blank more than the builder's text
-               "***Can't get DNS Client ObjectPaths.                  Exiting EnumerateInstanceNames***");
-      return status;
+    if (!fetchEndpoints(operation, factory, ref, endpoints)) {
+      return fail(operation, "***Can't get DNS Client ObjectPaths.                  Exiting EnumerateInstanceNames***");
     }
-    for (unsigned short i = 0; i < count16(endpoints); ++i) {
-      CMPIObjectPath* endpoint = endpoints.at(i);
-      if (isMissing(endpoint, loggerDNSHostAccessPoint, ZV_HERE, "CMPIObjectPath is NULL for DNS Client")) {
-        return status;
-      }
-      if (name != keyText(endpoint, "SystemName", &status)) continue;  // stricter than the builder
+    for (CMPIObjectPath* endpoint : counted16(endpoints)) {
+      if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Client")) return operation.status;
+      if (name != keyText(endpoint, "SystemName", &operation.status)) continue;  // stricter than the builder
       setNameSpace(endpoint, nameSpace);
-      CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsHostedAccessPointClass, &status);
-      if (isMissing(path, loggerDNSHostAccessPoint, ZV_HERE,
+      CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsHostedAccessPointClass, &operation.status);
+      if (isMissing(operation, path,
                     "Create CMPIObjectPath failed for                     dnsHostedAccessPointClass.")) {
-        return status;
+        return operation.status;
       }
-      addReferenceKey(path, "Antecedent", system);
-      addReferenceKey(path, "Dependent", endpoint);
-      returnObjectPath(result, path);
+      returnPairPath(operation, path, "Antecedent", system, "Dependent", endpoint);
     }
   }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSHostAccessPoint);
-  return status;
+  return end(operation);
 }
 
 static CMPIStatus DNSHostedAccessPoint_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                      const CMPIResult* result, const CMPIObjectPath* ref,
                                                      const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSHostAccessPoint);
-  std::vector<CMPIInstance*> instances;
-  if (DNSHostedAccessPointCMPIInstances(ref, properties, context, instances) == 0) returnAll(result, instances);
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSHostAccessPoint);
-  return kStatusOk;
+  const Operation operation = ZV_OPERATION(context, result, ref);
+  returnBuilt(operation, DNSHostedAccessPointCMPIInstances, properties);
+  return end(operation);
 }
 
 static CMPIStatus DNSHostedAccessPoint_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
                                                    const CMPIResult* result, const CMPIObjectPath* ref,
                                                    const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSHostAccessPoint);
-  CMPIStatus status = kStatusOk;
-  std::vector<CMPIInstance*> instances;
-  if (keyCountOf(ref, &status) == 0) {
-    logError(loggerDNSHostAccessPoint, ZV_HERE, "At least one key should be passed");
-  } else if (DNSHostedAccessPointCMPIInstances(ref, properties, context, instances) == 0) {
-    returnFirstEqual(result, ref, instances, true, &status);
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSHostAccessPoint);
-  return status;
+  Operation operation = ZV_OPERATION(context, result, ref);
+  returnEqualBuilt(operation, DNSHostedAccessPointCMPIInstances, properties);
+  return end(operation);
 }
 
 // The four operations below never call returnDone.
 
-namespace {
-
-bool isOfComputerSystem(const std::string& systemCreationClassName) {
+static bool isOfComputerSystem(const std::string& systemCreationClassName) {
   return strcasecmp(systemCreationClassName.c_str(), computerSystemClass) == 0;
 }
-
-}  // namespace
 
 static CMPIStatus DNSHostedAccessPoint_Associators(CMPIAssociationMI*, const CMPIContext* context,
                                                    const CMPIResult* result, const CMPIObjectPath* ref,
                                                    const char* assocClass, const char* resultClass, const char*,
                                                    const char*, const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSHostAccessPoint);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd = factory.get_assoc_targetClass_ObjectPath(
-      broker, ref, associationOr(assocClass, dnsHostedAccessPointClass), resultClass, &status);
-  if (isMissing(farEnd, loggerDNSHostAccessPoint, ZV_HERE, "Object Path is NULL in Associators.")) return status;
-
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == computerSystemClass) {
-    const std::string systemName = keyText(ref, "SystemName", &status);
-    if (!passesResultClass(resultClass, computerSystemClass, "CIM_ComputerSystem")) return status;
-    const CMPIEnumeration* systems = enumerateInstances(broker, context, farEnd, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSHostAccessPoint, ZV_HERE, "CBEnumInstances Failed for the target Class");
-      return status;
+  const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsHostedAccessPointClass),
+                                      resultClass, "Object Path is NULL in Associators.");
+  if (!isGood(farEnd.path)) return operation.status;
+  if (farEnd.className == computerSystemClass) {
+    const std::string systemName = sourceKey(operation, "SystemName");
+    if (!passesResultClass(resultClass, computerSystemClass, "CIM_ComputerSystem")) return operation.status;
+    const CMPIEnumeration* systems = nullptr;
+    if (!askForInstances(operation, farEnd.path, "CBEnumInstances Failed for the target Class", systems)) {
+      return operation.status;
     }
-    while (hasNext(systems, &status)) {
-      const CMPIInstance* system = nextInstance(systems, &status);
-      if (keyText(objectPathOf(system, &status), "Name", &status) == systemName) returnInstance(result, system);
+    while (hasNext(systems, &operation.status)) {
+      const CMPIInstance* system = nextInstance(systems, &operation.status);
+      const CMPIObjectPath* path = objectPathOf(system, &operation.status);
+      if (keyText(path, "Name", &operation.status) == systemName) returnInstance(result, system);
     }
-  } else if (farEndClass == dnsProtocolEndPointClass) {
-    const std::string name = keyText(ref, "Name", &status);
-    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndpoint")) return status;
+  } else if (farEnd.className == dnsProtocolEndPointClass) {
+    const std::string name = sourceKey(operation, "Name");
+    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndpoint")) return operation.status;
     std::vector<CMPIInstance*> endpoints;
-    endpoints.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIInstances(broker, farEnd, properties, false, endpoints, &status) != 0) {
-      logError(loggerDNSHostAccessPoint, ZV_HERE,
-               "***Can't get DNS Client ObjectPaths.                 Exiting Associators***");
-      return status;
+    if (!fetchEndpoints(operation, factory, farEnd.path, properties, endpoints)) {
+      return fail(operation, "***Can't get DNS Client ObjectPaths.                 Exiting Associators***");
     }
-    for (unsigned short i = 0; i < count16(endpoints); ++i) {
-      const CMPIInstance* endpoint = endpoints.at(i);
-      if (propertyText(endpoint, "SystemName", &status) != name) continue;
-      if (!isOfComputerSystem(propertyText(endpoint, "SystemCreationClassName", &status))) continue;
+    for (const CMPIInstance* endpoint : counted16(endpoints)) {
+      if (propertyText(endpoint, "SystemName", &operation.status) != name) continue;
+      if (!isOfComputerSystem(propertyText(endpoint, "SystemCreationClassName", &operation.status))) continue;
       returnInstance(result, endpoint);
     }
   }
-  ZV_PROVIDER_EXIT(loggerDNSHostAccessPoint);
-  return status;
+  return endWithoutDone(operation);
 }
 
 static CMPIStatus DNSHostedAccessPoint_AssociatorNames(CMPIAssociationMI*, const CMPIContext* context,
                                                        const CMPIResult* result, const CMPIObjectPath* ref,
                                                        const char* assocClass, const char* resultClass, const char*,
                                                        const char*) {
-  ZV_PROVIDER_ENTRY(loggerDNSHostAccessPoint);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd = factory.get_assoc_targetClass_ObjectPath(
-      broker, ref, associationOr(assocClass, dnsHostedAccessPointClass), resultClass, &status);
-  if (isMissing(farEnd, loggerDNSHostAccessPoint, ZV_HERE, "Object Path is NULL in AssociatorNames.")) return status;
-
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == computerSystemClass) {
-    const std::string systemName = keyText(ref, "SystemName", &status);
-    if (!passesResultClass(resultClass, computerSystemClass, "CIM_ComputerSystem")) return status;
-    const CMPIEnumeration* systems = enumerateInstanceNames(broker, context, farEnd, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSHostAccessPoint, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
+  const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsHostedAccessPointClass),
+                                      resultClass, "Object Path is NULL in AssociatorNames.");
+  if (!isGood(farEnd.path)) return operation.status;
+  if (farEnd.className == computerSystemClass) {
+    const std::string systemName = sourceKey(operation, "SystemName");
+    if (!passesResultClass(resultClass, computerSystemClass, "CIM_ComputerSystem")) return operation.status;
+    const CMPIEnumeration* systems = nullptr;
+    if (!askForNames(operation, farEnd.path, systems)) return operation.status;
+    while (hasNext(systems, &operation.status)) {
+      const CMPIObjectPath* system = nextPath(systems, &operation.status);
+      if (keyText(system, "Name", &operation.status) == systemName) returnObjectPath(result, system);
     }
-    while (hasNext(systems, &status)) {
-      const CMPIObjectPath* system = nextPath(systems, &status);
-      if (keyText(system, "Name", &status) == systemName) returnObjectPath(result, system);
-    }
-  } else if (farEndClass == dnsProtocolEndPointClass) {
-    const std::string name = keyText(ref, "Name", &status);
-    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndpoint")) return status;
+  } else if (farEnd.className == dnsProtocolEndPointClass) {
+    const std::string name = sourceKey(operation, "Name");
+    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndpoint")) return operation.status;
     std::vector<CMPIObjectPath*> endpoints;
-    endpoints.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIObjPaths(broker, farEnd, endpoints, &status) != 0) {
-      logError(loggerDNSHostAccessPoint, ZV_HERE,  // the text tells of another object than the one that failed
-               "***Can't get Service processor ObjectPaths.                 Exiting AssociatorNames***");
-      return status;
+    if (!fetchEndpoints(operation, factory, farEnd.path, endpoints)) {
+      return fail(operation, "***Can't get Service processor ObjectPaths.                 Exiting AssociatorNames***");
     }
-    const std::string nameSpace = nameSpaceOf(ref, &status);
-    for (unsigned short i = 0; i < count16(endpoints); ++i) {
-      CMPIObjectPath* endpoint = endpoints.at(i);
-      if (keyText(endpoint, "SystemName", &status) != name) continue;
-      if (!isOfComputerSystem(keyText(endpoint, "SystemCreationClassName", &status))) continue;
+    const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+    for (CMPIObjectPath* endpoint : counted16(endpoints)) {
+      if (keyText(endpoint, "SystemName", &operation.status) != name) continue;
+      if (!isOfComputerSystem(keyText(endpoint, "SystemCreationClassName", &operation.status))) continue;
       setNameSpaceAndHost(endpoint, nameSpace);
       returnObjectPath(result, endpoint);
     }
   }
-  ZV_PROVIDER_EXIT(loggerDNSHostAccessPoint);
-  return status;
+  return endWithoutDone(operation);
+}
+
+static CMPIStatus refer(Operation operation, const char* noFarEnd, Deliver deliver) {
+  DNSClientObjFactory factory;
+  const auto [farEnd, nameSpace, association] = resolveReferences(operation, factory, dnsHostedAccessPointClass,
+                                                                  newHostPath, dnsHostedAccessPointClass, noFarEnd);
+  if (!isGood(farEnd.path)) return operation.status;
+  if (farEnd.className == dnsProtocolEndPointClass) {
+    const std::string name = sourceKey(operation, "Name");
+    std::vector<CMPIObjectPath*> endpoints;
+    if (!fetchEndpoints(operation, factory, farEnd.path, endpoints)) {
+      return fail(operation, "***Can't get DNS Client instances                 Exiting References***");
+    }
+    for (CMPIObjectPath* endpoint : counted16(endpoints)) {
+      if (keyText(endpoint, "SystemName", &operation.status) != name) continue;
+      CMPIInstance* reference = newInstance(broker, association, &operation.status);
+      setNameSpaceAndHost(endpoint, nameSpace);
+      setPair(reference, "Antecedent", operation.ref, "Dependent", endpoint);
+      deliver(operation, reference, nameSpace);
+    }
+  } else if (farEnd.className == computerSystemClass) {
+    const std::string systemName = sourceKey(operation, "SystemName");
+    const CMPIEnumeration* systems = nullptr;
+    if (!askForNames(operation, farEnd.path, systems)) return operation.status;
+    while (hasNext(systems, &operation.status)) {
+      const CMPIObjectPath* system = nextPath(systems, &operation.status);
+      if (keyText(system, "Name", &operation.status) != systemName) continue;
+      const CMPIInstance* reference = newPair(operation, association, "Antecedent", system, "Dependent", operation.ref);
+      deliver(operation, reference, nameSpace);
+    }
+  }
+  return endWithoutDone(operation);
 }
 
 static CMPIStatus DNSHostedAccessPoint_References(CMPIAssociationMI*, const CMPIContext* context,
                                                   const CMPIResult* result, const CMPIObjectPath* ref, const char*,
                                                   const char*, const char**) {
-  ZV_PROVIDER_ENTRY(loggerDNSHostAccessPoint);
-  CMPIStatus status = kStatusOk;
-  DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd =
-      factory.get_assoc_targetClass_ObjectPath(broker, ref, dnsHostedAccessPointClass, nullptr, &status);
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* association = newHostPath(broker, nameSpace, dnsHostedAccessPointClass, &status);
-  if (isMissing(farEnd, loggerDNSHostAccessPoint, ZV_HERE, "Object Path is NULL in References.")) return status;
-
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == dnsProtocolEndPointClass) {
-    const std::string name = keyText(ref, "Name", &status);
-    std::vector<CMPIObjectPath*> endpoints;
-    endpoints.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIObjPaths(broker, farEnd, endpoints, &status) != 0) {
-      logError(loggerDNSHostAccessPoint, ZV_HERE,
-               "***Can't get DNS Client instances                 Exiting References***");
-      return status;
-    }
-    for (unsigned short i = 0; i < count16(endpoints); ++i) {
-      CMPIObjectPath* endpoint = endpoints.at(i);
-      if (keyText(endpoint, "SystemName", &status) != name) continue;
-      CMPIInstance* reference = newInstance(broker, association, &status);
-      setNameSpaceAndHost(endpoint, nameSpace);
-      setReference(reference, "Antecedent", ref);
-      setReference(reference, "Dependent", endpoint);
-      returnInstance(result, reference);
-    }
-  } else if (farEndClass == computerSystemClass) {
-    const std::string systemName = keyText(ref, "SystemName", &status);
-    const CMPIEnumeration* systems = enumerateInstanceNames(broker, context, farEnd, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSHostAccessPoint, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(systems, &status)) {
-      const CMPIObjectPath* system = nextPath(systems, &status);
-      if (keyText(system, "Name", &status) != systemName) continue;
-      returnInstance(result, newPair(broker, association, "Antecedent", system, "Dependent", ref, &status));
-    }
-  }
-  ZV_PROVIDER_EXIT(loggerDNSHostAccessPoint);
-  return status;
+  return refer(ZV_OPERATION(context, result, ref), "Object Path is NULL in References.", deliverInstance);
 }
 
 static CMPIStatus DNSHostedAccessPoint_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
                                                       const CMPIResult* result, const CMPIObjectPath* ref, const char*,
                                                       const char*) {
-  ZV_PROVIDER_ENTRY(loggerDNSHostAccessPoint);
-  CMPIStatus status = kStatusOk;
-  DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd =
-      factory.get_assoc_targetClass_ObjectPath(broker, ref, dnsHostedAccessPointClass, nullptr, &status);
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* association = newHostPath(broker, nameSpace, dnsHostedAccessPointClass, &status);
-  if (isMissing(farEnd, loggerDNSHostAccessPoint, ZV_HERE, "Object Path is NULL in ReferenceNames.")) return status;
-
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == dnsProtocolEndPointClass) {
-    const std::string name = keyText(ref, "Name", &status);
-    std::vector<CMPIObjectPath*> endpoints;
-    endpoints.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIObjPaths(broker, farEnd, endpoints, &status) != 0) {
-      logError(loggerDNSHostAccessPoint, ZV_HERE,  // the text of the references
-               "***Can't get DNS Client instances                 Exiting References***");
-      return status;
-    }
-    for (unsigned short i = 0; i < count16(endpoints); ++i) {
-      CMPIObjectPath* endpoint = endpoints.at(i);
-      if (keyText(endpoint, "SystemName", &status) != name) continue;
-      CMPIInstance* reference = newInstance(broker, association, &status);
-      setNameSpaceAndHost(endpoint, nameSpace);
-      setReference(reference, "Antecedent", ref);
-      setReference(reference, "Dependent", endpoint);
-      CMPIObjectPath* path = objectPathOf(reference, &status);
-      setNameSpaceAndHost(path, nameSpace);
-      returnObjectPath(result, path);
-    }
-  } else if (farEndClass == computerSystemClass) {
-    const std::string systemName = keyText(ref, "SystemName", &status);
-    const CMPIEnumeration* systems = enumerateInstanceNames(broker, context, farEnd, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSHostAccessPoint, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(systems, &status)) {
-      const CMPIObjectPath* system = nextPath(systems, &status);
-      if (keyText(system, "Name", &status) != systemName) continue;
-      CMPIObjectPath* path =
-          objectPathOf(newPair(broker, association, "Antecedent", system, "Dependent", ref, &status), &status);
-      setNameSpaceAndHost(path, nameSpace);
-      returnObjectPath(result, path);
-    }
-  }
-  ZV_PROVIDER_EXIT(loggerDNSHostAccessPoint);
-  return status;
+  return refer(ZV_OPERATION(context, result, ref), "Object Path is NULL in ReferenceNames.", deliverPathOnThisHost);
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSHostedAccessPoint)

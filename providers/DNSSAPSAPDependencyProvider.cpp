@@ -1,17 +1,17 @@
 // ZORVA_DNSSAPSAPDependency: the IP endpoint beneath each DNS endpoint. Instance and association provider; the IP
 // endpoints are served elsewhere and asked for through the broker.
 //
-// Two rules tell what belongs together. The enumerations, and the associators of an IP endpoint, compare whole names.
+// Two rules say what belongs together. The enumerations, and the associators of an IP endpoint, compare whole names.
 // The references, and the associators of a DNS endpoint, compare the first part of the IP endpoint's name, up to a "_",
 // with the DNS endpoint's: an interface's further addresses are named that way.
 #include "factory/DNSClientObjFactory.h"
-#include "providers/AssociationSteps.h"
+#include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"
 #include "providers/Results.h"
 
 namespace ZV {
 
-static const std::string loggerDNSSAPDependency = "Zorvagent.DNSSAPSAPDependencyProvider";
+static const std::string logCategory = "Zorvagent.DNSSAPSAPDependencyProvider";
 static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
 static const char* const dnsSAPSAPDependencyClass = "ZORVA_DNSSAPSAPDependency";
 static const char* const ipInterfaceClass = "ZORVA_IPProtocolEndpoint";
@@ -26,127 +26,88 @@ bool firstTokenEquals(const std::string& ipName, const std::string& dnsName) {
 }
 
 // Looks for the DNS endpoint of an IP endpoint's whole name: null where the path has no name or no endpoint has it.
-// False, with a line to the log, where the look-up fails.
-bool findEndpoint(DNSClientObjFactory& factory, const CMPIObjectPath* ref, const CMPIObjectPath* ipEndpoint,
-                  bool isObjPath, const char** properties, const LogSite& site, CMPIInstance*& endpoint,
-                  CMPIStatus* status) {
+// False, with an error, where the look-up fails.
+bool findEndpoint(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* ipEndpoint, bool isObjPath,
+                  const char** properties, CMPIInstance*& endpoint, const Place& place = Place::here()) {
   endpoint = nullptr;
-  const CMPIString* name = stringOf(getKey(ipEndpoint, "Name", status));
+  const CMPIString* name = stringOf(getKey(ipEndpoint, "Name", &operation.status));
   if (!isGood(name)) return true;
-  if (factory.getDNSClientCMPIInstanceFromIPInterface(broker, ref, textOf(name, status), endpoint, isObjPath,
-                                                      properties, status) == 0) {
-    return true;
-  }
-  logError(loggerDNSSAPDependency, site, "getDNSClientCMPIInstanceFromIPInterface Failed");
-  return false;
+  return factory.getDNSClientCMPIInstanceFromIPInterface(broker, operation.ref, textOf(name, &operation.status),
+                                                         endpoint, isObjPath, properties, &operation.status) == 0 ||
+         complain(operation, "getDNSClientCMPIInstanceFromIPInterface Failed", place);
 }
 
 }  // namespace
 
-static unsigned short DNSSAPSAPDependencyCMPIInstances(const CMPIObjectPath* ref, const char** properties,
-                                                       const CMPIContext* context,
-                                                       std::vector<CMPIInstance*>& instances) {
-  ZV_PROVIDER_ENTRY(loggerDNSSAPDependency);
-  CMPIStatus status = kStatusOk;
+static bool DNSSAPSAPDependencyCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
+                                             const char** properties, std::vector<CMPIInstance*>& instances) {
+  Operation operation = ZV_OPERATION(context, nullptr, ref);
   DNSClientObjFactory factory;
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* ipClass = newPath(broker, nameSpace, ipInterfaceClass, &status);
-  if (isMissing(ipClass, loggerDNSSAPDependency, ZV_HERE, "Create CMPIObjectPath failed for IpInterfaceClass.")) {
-    return 1;
-  }
-  const CMPIEnumeration* ipEndpoints = enumerateInstanceNames(broker, context, ipClass, &status);
-  if (status.rc != CMPI_RC_OK) {
-    logError(loggerDNSSAPDependency, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-    return 1;
-  }
-  while (hasNext(ipEndpoints, &status)) {
-    const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &status);
+  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  CMPIObjectPath* ipClass = newPath(broker, nameSpace, ipInterfaceClass, &operation.status);
+  if (isMissing(operation, ipClass, "Create CMPIObjectPath failed for IpInterfaceClass.")) return false;
+  const CMPIEnumeration* ipEndpoints = nullptr;
+  if (!askForNames(operation, ipClass, ipEndpoints)) return false;
+  while (hasNext(ipEndpoints, &operation.status)) {
+    const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &operation.status);
     CMPIInstance* endpoint = nullptr;
-    if (!findEndpoint(factory, ref, ipEndpoint, false, properties, ZV_HERE, endpoint, &status)) return 1;
+    if (!findEndpoint(operation, factory, ipEndpoint, false, properties, endpoint)) return false;
     if (!isGood(endpoint)) continue;
-    CMPIObjectPath* endpointPath = objectPathOf(endpoint, &status);
-    if (isMissing(endpointPath, loggerDNSSAPDependency, ZV_HERE, "CMPIObjectPath is NULL for DNS Client")) return 1;
+    CMPIObjectPath* endpointPath = objectPathOf(endpoint, &operation.status);
+    if (isMissing(operation, endpointPath, "CMPIObjectPath is NULL for DNS Client")) return false;
     setNameSpaceAndHost(endpointPath, nameSpace);
-    CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsSAPSAPDependencyClass, &status);
-    if (isMissing(path, loggerDNSSAPDependency, ZV_HERE,
-                  "Create CMPIObjectPath failed for \t\t\t\tDNSSAPSAPDependency.")) {
-      return 1;
-    }
-    CMPIInstance* instance = newInstance(broker, path, &status);
+    CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsSAPSAPDependencyClass, &operation.status);
+    if (isMissing(operation, path, "Create CMPIObjectPath failed for \t\t\t\tDNSSAPSAPDependency.")) return false;
+    CMPIInstance* instance = newInstance(broker, path, &operation.status);
     if (!isGood(instance)) continue;
     setPropertyFilter(instance, properties, {"Antecedent", "Dependent"});
-    setReference(instance, "Antecedent", ipEndpoint);
-    setReference(instance, "Dependent", endpointPath);
+    setPair(instance, "Antecedent", ipEndpoint, "Dependent", endpointPath);
     instances.push_back(instance);
   }
-  ZV_PROVIDER_EXIT(loggerDNSSAPDependency);
-  return 0;
+  markExit(operation);
+  return true;
 }
 
 // Delivers each path at once: a failure further on leaves what went out, and the result open.
 static CMPIStatus DNSSAPSAPDependency_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                         const CMPIResult* result, const CMPIObjectPath* ref) {
-  ZV_PROVIDER_ENTRY(loggerDNSSAPDependency);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* ipClass = newPath(broker, nameSpace, ipInterfaceClass, &status);
-  if (isMissing(ipClass, loggerDNSSAPDependency, ZV_HERE, "Create CMPIObjectPath failed for IpInterfaceClass.")) {
-    return status;
-  }
-  const CMPIEnumeration* ipEndpoints = enumerateInstanceNames(broker, context, ipClass, &status);
-  if (status.rc != CMPI_RC_OK) {
-    logError(loggerDNSSAPDependency, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-    return status;
-  }
-  while (hasNext(ipEndpoints, &status)) {
-    const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &status);
+  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  CMPIObjectPath* ipClass = newPath(broker, nameSpace, ipInterfaceClass, &operation.status);
+  if (isMissing(operation, ipClass, "Create CMPIObjectPath failed for IpInterfaceClass.")) return operation.status;
+  const CMPIEnumeration* ipEndpoints = nullptr;
+  if (!askForNames(operation, ipClass, ipEndpoints)) return operation.status;
+  while (hasNext(ipEndpoints, &operation.status)) {
+    const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &operation.status);
     CMPIInstance* endpoint = nullptr;
-    if (!findEndpoint(factory, ref, ipEndpoint, true, nullptr, ZV_HERE, endpoint, &status)) return status;
+    if (!findEndpoint(operation, factory, ipEndpoint, true, nullptr, endpoint)) return operation.status;
     if (!isGood(endpoint)) continue;
-    CMPIObjectPath* endpointPath = objectPathOf(endpoint, &status);
-    if (isMissing(endpointPath, loggerDNSSAPDependency, ZV_HERE, "CMPIObjectPath is NULL for DNS Client")) {
-      return status;
-    }
+    CMPIObjectPath* endpointPath = objectPathOf(endpoint, &operation.status);
+    if (isMissing(operation, endpointPath, "CMPIObjectPath is NULL for DNS Client")) return operation.status;
     setNameSpaceAndHost(endpointPath, nameSpace);
-    CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsSAPSAPDependencyClass, &status);
-    if (isMissing(path, loggerDNSSAPDependency, ZV_HERE,
-                  "Create CMPIObjectPath failed for \t\t\t\tdnsSAPSAPDependencyClass.")) {
-      return status;
+    CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsSAPSAPDependencyClass, &operation.status);
+    if (isMissing(operation, path, "Create CMPIObjectPath failed for \t\t\t\tdnsSAPSAPDependencyClass.")) {
+      return operation.status;
     }
-    addReferenceKey(path, "Antecedent", ipEndpoint);
-    addReferenceKey(path, "Dependent", endpointPath);
-    returnObjectPath(result, path);
+    returnPairPath(operation, path, "Antecedent", ipEndpoint, "Dependent", endpointPath);
   }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSSAPDependency);
-  return status;
+  return end(operation);
 }
 
 static CMPIStatus DNSSAPSAPDependency_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                     const CMPIResult* result, const CMPIObjectPath* ref,
                                                     const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSSAPDependency);
-  std::vector<CMPIInstance*> instances;
-  if (DNSSAPSAPDependencyCMPIInstances(ref, properties, context, instances) == 0) returnAll(result, instances);
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSSAPDependency);
-  return kStatusOk;
+  const Operation operation = ZV_OPERATION(context, result, ref);
+  returnBuilt(operation, DNSSAPSAPDependencyCMPIInstances, properties);
+  return end(operation);
 }
 
 static CMPIStatus DNSSAPSAPDependency_GetInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                                   const CMPIObjectPath* ref, const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSSAPDependency);
-  CMPIStatus status = kStatusOk;
-  std::vector<CMPIInstance*> instances;
-  if (keyCountOf(ref, &status) == 0) {
-    logError(loggerDNSSAPDependency, ZV_HERE, "At least one key should be passed");
-  } else if (DNSSAPSAPDependencyCMPIInstances(ref, properties, context, instances) == 0) {
-    returnFirstEqual(result, ref, instances, true, &status);
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSSAPDependency);
-  return status;
+  Operation operation = ZV_OPERATION(context, result, ref);
+  returnEqualBuilt(operation, DNSSAPSAPDependencyCMPIInstances, properties);
+  return end(operation);
 }
 
 // The four operations below never call returnDone.
@@ -155,171 +116,105 @@ static CMPIStatus DNSSAPSAPDependency_Associators(CMPIAssociationMI*, const CMPI
                                                   const CMPIResult* result, const CMPIObjectPath* ref,
                                                   const char* assocClass, const char* resultClass, const char*,
                                                   const char*, const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSSAPDependency);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd = factory.get_assoc_targetClass_ObjectPath(
-      broker, ref, associationOr(assocClass, dnsSAPSAPDependencyClass), resultClass, &status);
-  if (isMissing(farEnd, loggerDNSSAPDependency, ZV_HERE, "Object Path is NULL in Associators.")) return status;
-
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == ipInterfaceClass) {
-    if (!passesResultClass(resultClass, ipInterfaceClass, "CIM_IPProtocolEndPoint")) return status;
-    const std::string name = keyText(ref, "Name", &status);
-    const CMPIEnumeration* ipEndpoints = enumerateInstances(broker, context, farEnd, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSSAPDependency, ZV_HERE, "Call to CBEnumInstances of target Class Failed.");
-      return status;
+  const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsSAPSAPDependencyClass),
+                                      resultClass, "Object Path is NULL in Associators.");
+  if (!isGood(farEnd.path)) return operation.status;
+  if (farEnd.className == ipInterfaceClass) {
+    if (!passesResultClass(resultClass, ipInterfaceClass, "CIM_IPProtocolEndPoint")) return operation.status;
+    const std::string name = sourceKey(operation, "Name");
+    const CMPIEnumeration* ipEndpoints = nullptr;
+    if (!askForInstances(operation, farEnd.path, "Call to CBEnumInstances of target Class Failed.", ipEndpoints)) {
+      return operation.status;
     }
-    while (hasNext(ipEndpoints, &status)) {
-      const CMPIInstance* ipEndpoint = nextInstance(ipEndpoints, &status);
-      if (!firstTokenEquals(propertyText(ipEndpoint, "Name", &status), name)) continue;
+    while (hasNext(ipEndpoints, &operation.status)) {
+      const CMPIInstance* ipEndpoint = nextInstance(ipEndpoints, &operation.status);
+      if (!firstTokenEquals(propertyText(ipEndpoint, "Name", &operation.status), name)) continue;
       returnInstance(result, ipEndpoint);
       break;  // the first match alone, where the references give all
     }
-  } else if (farEndClass == dnsProtocolEndPointClass) {
-    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) return status;
+  } else if (farEnd.className == dnsProtocolEndPointClass) {
+    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) return operation.status;
     CMPIInstance* endpoint = nullptr;
-    if (!findEndpoint(factory, ref, ref, false, properties, ZV_HERE, endpoint, &status)) return status;
+    if (!findEndpoint(operation, factory, ref, false, properties, endpoint)) return operation.status;
     if (endpoint != nullptr) returnInstance(result, endpoint);
   }
-  ZV_PROVIDER_EXIT(loggerDNSSAPDependency);
-  return status;
+  return endWithoutDone(operation);
 }
 
 static CMPIStatus DNSSAPSAPDependency_AssociatorNames(CMPIAssociationMI*, const CMPIContext* context,
                                                       const CMPIResult* result, const CMPIObjectPath* ref,
                                                       const char* assocClass, const char* resultClass, const char*,
                                                       const char*) {
-  ZV_PROVIDER_ENTRY(loggerDNSSAPDependency);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd = factory.get_assoc_targetClass_ObjectPath(
-      broker, ref, associationOr(assocClass, dnsSAPSAPDependencyClass), resultClass, &status);
-  if (isMissing(farEnd, loggerDNSSAPDependency, ZV_HERE, "Object Path is NULL in AssociatorNames.")) return status;
-
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == ipInterfaceClass) {
-    if (!passesResultClass(resultClass, ipInterfaceClass, "CIM_IPProtocolEndPoint")) return status;
-    const std::string name = keyText(ref, "Name", &status);
-    const CMPIEnumeration* ipEndpoints = enumerateInstanceNames(broker, context, farEnd, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSSAPDependency, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(ipEndpoints, &status)) {
-      const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &status);
-      if (!firstTokenEquals(keyText(ipEndpoint, "Name", &status), name)) continue;
-      returnObjectPath(result, ipEndpoint);  // as it came from the broker
+  const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsSAPSAPDependencyClass),
+                                      resultClass, "Object Path is NULL in AssociatorNames.");
+  if (!isGood(farEnd.path)) return operation.status;
+  if (farEnd.className == ipInterfaceClass) {
+    if (!passesResultClass(resultClass, ipInterfaceClass, "CIM_IPProtocolEndPoint")) return operation.status;
+    const std::string name = sourceKey(operation, "Name");
+    const CMPIEnumeration* ipEndpoints = nullptr;
+    if (!askForNames(operation, farEnd.path, ipEndpoints)) return operation.status;
+    while (hasNext(ipEndpoints, &operation.status)) {
+      const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &operation.status);
+      if (!firstTokenEquals(keyText(ipEndpoint, "Name", &operation.status), name)) continue;
+      returnObjectPath(result, ipEndpoint);
       break;
     }
-  } else if (farEndClass == dnsProtocolEndPointClass) {
-    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) return status;
+  } else if (farEnd.className == dnsProtocolEndPointClass) {
+    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) return operation.status;
     CMPIInstance* endpoint = nullptr;
-    if (!findEndpoint(factory, ref, ref, true, nullptr, ZV_HERE, endpoint, &status)) return status;
-    if (endpoint != nullptr) returnObjectPath(result, objectPathOf(endpoint, &status));
+    if (!findEndpoint(operation, factory, ref, true, nullptr, endpoint)) return operation.status;
+    if (endpoint != nullptr) returnObjectPath(result, objectPathOf(endpoint, &operation.status));
   }
-  ZV_PROVIDER_EXIT(loggerDNSSAPDependency);
-  return status;
+  return endWithoutDone(operation);
+}
+
+static CMPIStatus refer(Operation operation, const char* noFarEnd, Deliver deliver) {
+  DNSClientObjFactory factory;
+  const auto [farEnd, nameSpace, association] =
+      resolveReferences(operation, factory, dnsSAPSAPDependencyClass, newHostPath, dnsSAPSAPDependencyClass, noFarEnd);
+  if (!isGood(farEnd.path)) return operation.status;
+  if (farEnd.className == dnsProtocolEndPointClass) {
+    std::vector<CMPIObjectPath*> endpoints;
+    if (!fetchEndpoints(operation, factory, farEnd.path, endpoints)) {
+      return fail(operation, "getAllDNSClientCMPIObjPaths Failed");
+    }
+    for (CMPIObjectPath* endpoint : counted16(endpoints)) {
+      const std::string sourceName = sourceKey(operation, "Name");
+      if (!firstTokenEquals(sourceName, keyText(endpoint, "Name", &operation.status))) continue;
+      CMPIInstance* reference = newInstance(broker, association, &operation.status);
+      setNameSpaceAndHost(endpoint, nameSpace);
+      setPair(reference, "Antecedent", operation.ref, "Dependent", endpoint);
+      deliver(operation, reference, nameSpace);
+    }
+  } else if (farEnd.className == ipInterfaceClass) {
+    const CMPIEnumeration* ipEndpoints = nullptr;
+    if (!askForNames(operation, farEnd.path, ipEndpoints)) return operation.status;
+    while (hasNext(ipEndpoints, &operation.status)) {
+      const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &operation.status);
+      const std::string ipName = keyText(ipEndpoint, "Name", &operation.status);
+      if (!firstTokenEquals(ipName, sourceKey(operation, "Name"))) continue;
+      const CMPIInstance* reference =
+          newPair(operation, association, "Antecedent", ipEndpoint, "Dependent", operation.ref);
+      deliver(operation, reference, nameSpace);
+    }
+  }
+  return endWithoutDone(operation);
 }
 
 static CMPIStatus DNSSAPSAPDependency_References(CMPIAssociationMI*, const CMPIContext* context,
                                                  const CMPIResult* result, const CMPIObjectPath* ref, const char*,
                                                  const char*, const char**) {
-  ZV_PROVIDER_ENTRY(loggerDNSSAPDependency);
-  CMPIStatus status = kStatusOk;
-  DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd =
-      factory.get_assoc_targetClass_ObjectPath(broker, ref, dnsSAPSAPDependencyClass, nullptr, &status);
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* association = newHostPath(broker, nameSpace, dnsSAPSAPDependencyClass, &status);
-  if (isMissing(farEnd, loggerDNSSAPDependency, ZV_HERE, "Object Path is NULL in References.")) return status;
-
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == dnsProtocolEndPointClass) {
-    std::vector<CMPIObjectPath*> endpoints;
-    endpoints.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIObjPaths(broker, farEnd, endpoints, &status) != 0) {
-      logError(loggerDNSSAPDependency, ZV_HERE, "getAllDNSClientCMPIObjPaths Failed");
-      return status;
-    }
-    for (unsigned short i = 0; i < count16(endpoints); ++i) {
-      CMPIObjectPath* endpoint = endpoints.at(i);
-      const std::string sourceName = keyText(ref, "Name", &status);
-      if (!firstTokenEquals(sourceName, keyText(endpoint, "Name", &status))) continue;
-      CMPIInstance* reference = newInstance(broker, association, &status);
-      setNameSpaceAndHost(endpoint, nameSpace);
-      setReference(reference, "Antecedent", ref);
-      setReference(reference, "Dependent", endpoint);
-      returnInstance(result, reference);
-    }
-  } else if (farEndClass == ipInterfaceClass) {
-    const CMPIEnumeration* ipEndpoints = enumerateInstanceNames(broker, context, farEnd, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSSAPDependency, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(ipEndpoints, &status)) {
-      const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &status);
-      const std::string ipName = keyText(ipEndpoint, "Name", &status);
-      if (!firstTokenEquals(ipName, keyText(ref, "Name", &status))) continue;
-      returnInstance(result, newPair(broker, association, "Antecedent", ipEndpoint, "Dependent", ref, &status));
-    }
-  }
-  ZV_PROVIDER_EXIT(loggerDNSSAPDependency);
-  return status;
+  return refer(ZV_OPERATION(context, result, ref), "Object Path is NULL in References.", deliverInstance);
 }
 
 static CMPIStatus DNSSAPSAPDependency_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
                                                      const CMPIResult* result, const CMPIObjectPath* ref, const char*,
                                                      const char*) {
-  ZV_PROVIDER_ENTRY(loggerDNSSAPDependency);
-  CMPIStatus status = kStatusOk;
-  DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd =
-      factory.get_assoc_targetClass_ObjectPath(broker, ref, dnsSAPSAPDependencyClass, nullptr, &status);
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* association = newHostPath(broker, nameSpace, dnsSAPSAPDependencyClass, &status);
-  if (isMissing(farEnd, loggerDNSSAPDependency, ZV_HERE, "Object Path is NULL in ReferenceNames.")) return status;
-
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == dnsProtocolEndPointClass) {
-    std::vector<CMPIObjectPath*> endpoints;
-    endpoints.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIObjPaths(broker, farEnd, endpoints, &status) != 0) {
-      logError(loggerDNSSAPDependency, ZV_HERE, "getAllDNSClientCMPIObjPaths Failed");
-      return status;
-    }
-    for (unsigned short i = 0; i < count16(endpoints); ++i) {
-      CMPIObjectPath* endpoint = endpoints.at(i);
-      const std::string sourceName = keyText(ref, "Name", &status);
-      if (!firstTokenEquals(sourceName, keyText(endpoint, "Name", &status))) continue;
-      CMPIInstance* reference = newInstance(broker, association, &status);
-      setNameSpaceAndHost(endpoint, nameSpace);
-      setReference(reference, "Antecedent", ref);
-      setReference(reference, "Dependent", endpoint);
-      CMPIObjectPath* path = objectPathOf(reference, &status);
-      setNameSpaceAndHost(path, nameSpace);
-      returnObjectPath(result, path);
-    }
-  } else if (farEndClass == ipInterfaceClass) {
-    const CMPIEnumeration* ipEndpoints = enumerateInstanceNames(broker, context, farEnd, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSSAPDependency, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(ipEndpoints, &status)) {
-      const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &status);
-      const std::string ipName = keyText(ipEndpoint, "Name", &status);
-      if (!firstTokenEquals(ipName, keyText(ref, "Name", &status))) continue;
-      CMPIObjectPath* path =
-          objectPathOf(newPair(broker, association, "Antecedent", ipEndpoint, "Dependent", ref, &status), &status);
-      setNameSpaceAndHost(path, nameSpace);
-      returnObjectPath(result, path);
-    }
-  }
-  ZV_PROVIDER_EXIT(loggerDNSSAPDependency);
-  return status;
+  return refer(ZV_OPERATION(context, result, ref), "Object Path is NULL in ReferenceNames.", deliverPathOnThisHost);
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSSAPSAPDependency)

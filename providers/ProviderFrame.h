@@ -11,6 +11,7 @@
 #include <vector>
 
 #include "factory/CmpiSupport.h"
+#include "providers/Operation.h"
 #include "trace/Trace.h"
 
 #define ZV_PROVIDER_EXPORT extern "C" __attribute__((visibility("default")))

@@ -7,23 +7,20 @@
 namespace ZV {
 
 void returnAll(const CMPIResult* result, const std::vector<CMPIInstance*>& instances) {
-  for (unsigned short i = 0; i < count16(instances); ++i) returnInstance(result, instances.at(i));
+  for (const CMPIInstance* instance : counted16(instances)) returnInstance(result, instance);
 }
 
 void returnAll(const CMPIResult* result, const std::vector<CMPIObjectPath*>& paths) {
-  for (unsigned short i = 0; i < count16(paths); ++i) returnObjectPath(result, paths.at(i));
+  for (const CMPIObjectPath* path : counted16(paths)) returnObjectPath(result, path);
 }
 
 void returnPathsOf(const CMPIResult* result, const std::vector<CMPIInstance*>& instances, CMPIStatus* status) {
-  for (unsigned short i = 0; i < count16(instances); ++i) {
-    returnObjectPath(result, objectPathOf(instances.at(i), status));
-  }
+  for (const CMPIInstance* instance : counted16(instances)) returnObjectPath(result, objectPathOf(instance, status));
 }
 
 void returnFirstEqual(const CMPIResult* result, const CMPIObjectPath* ref, const std::vector<CMPIInstance*>& instances,
                       bool keysAreReferences, CMPIStatus* status) {
-  for (unsigned short i = 0; i < count16(instances); ++i) {
-    const CMPIInstance* instance = instances.at(i);
+  for (const CMPIInstance* instance : counted16(instances)) {
     if (!isGood(instance) || !isObjPathsEqual(ref, objectPathOf(instance, status), keysAreReferences)) continue;
     returnInstance(result, instance);
     return;

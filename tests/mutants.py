@@ -42,7 +42,7 @@ NEAREST = [
     (r"factory/", ["factory_setting_test", "provider_setting_test"]),
     (r"providers/(DNSClientProvider|DNSRemoteService|ProviderFrame)", ["provider_client_test"]),
     (r"providers/DNS(General)?SettingDataProvider", ["provider_setting_test"]),
-    (r"providers/(DNSHosted|DNSSAPSAP|DNSRemoteAccess|DNSGeneralElement|AssociationSteps|Results)",
+    (r"providers/(DNSHosted|DNSSAPSAP|DNSRemoteAccess|DNSGeneralElement|AssociationOperation|Operation|Results)",
      ["provider_associations_test"]),
     (r"providers/", ["provider_setting_association_test"]),
 ]

@@ -77,7 +77,16 @@ inline const char* trace(const char* name, const char* file, unsigned int line, 
   return messageBuffer;
 }
 
-// The place that a line tells of. A shared step is handed the place of the provider that runs it.
+// A statement's place in its source. The default argument of a function is the place of the statement that calls it.
+struct Place {
+  const char* file;
+  unsigned int line;
+  static constexpr Place here(const char* file = __builtin_FILE(), unsigned int line = __builtin_LINE()) {
+    return {file, line};
+  }
+};
+
+// The function that a line names, and its place.
 struct LogSite {
   const char* function;
   const char* file;

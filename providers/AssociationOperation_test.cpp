@@ -1,4 +1,4 @@
-#include "providers/AssociationSteps.h"
+#include "providers/AssociationOperation.h"
 
 #include <gmock/gmock.h>
 
@@ -74,25 +74,30 @@ TEST(AssociationOr, IsTheProvidersOwnOnlyWhereNoneIsGiven) {
 
 // --- Paths and pairs
 
-TEST(IsMissing, TellsOfPathsThatAreNullOrWithoutHandleAtThePlaceThatIsGiven) {
+TEST(IsMissing, TellsOfPathsThatAreNullOrWithoutHandleInTheOperationsNameAtTheCallersPlace) {
   RecordingLogger logger;
   RecordingBroker broker;
-  const LogSite site = {"SomeProvider_References", "providers/SomeProvider.cpp", 7};
+  const std::string category = "Zorvagent.SomeProvider";
+  const Operation operation = {broker.cmpi(), category, "SomeProvider_References", nullptr, nullptr,
+                               nullptr,       kStatusOk};
   CMPIObjectPath* path = broker.make(Path("ZORVA_X"));
-  EXPECT_FALSE(isMissing(path, "Zorvagent.SomeProvider", site, "gone"));
+  EXPECT_FALSE(isMissing(operation, path, "gone"));
   EXPECT_EQ(0U, logger.size());
 
   path->hdl = nullptr;
-  EXPECT_TRUE(isMissing(path, "Zorvagent.SomeProvider", site, "gone"));
-  EXPECT_TRUE(isMissing(nullptr, "Zorvagent.SomeProvider", site, "gone"));
+  EXPECT_TRUE(isMissing(operation, path, "gone"));
+  const unsigned int firstLine = __LINE__ - 1;
+  EXPECT_TRUE(isMissing(operation, nullptr, "gone"));
   const LogLines lines = logger.pairs();
   EXPECT_THAT(lines.briefsWithCategory(),
               ElementsAre("Zorvagent.SomeProvider 6000 MESSAGE gone", "Zorvagent.SomeProvider 6000 MESSAGE gone"));
+  unsigned int expectedLine = firstLine;
   for (const LogLine& line : lines) {
     EXPECT_EQ("SomeProvider_References", line.function);
-    EXPECT_EQ("providers/SomeProvider.cpp", line.file);
-    EXPECT_EQ(7, line.line);
-    EXPECT_EQ("MESSAGE [File: providers/SomeProvider.cpp, Line: 7]: gone", line.text);
+    EXPECT_EQ("providers/AssociationOperation_test.cpp", line.file);
+    EXPECT_EQ(expectedLine, static_cast<unsigned int>(line.line));
+    EXPECT_EQ("MESSAGE [File: " + line.file + ", Line: " + std::to_string(expectedLine) + "]: gone", line.text);
+    expectedLine += 2;
   }
   EXPECT_THAT(broker.calls(), IsEmpty());
 }
@@ -100,11 +105,12 @@ TEST(IsMissing, TellsOfPathsThatAreNullOrWithoutHandleAtThePlaceThatIsGiven) {
 class NewPair : public ::testing::Test {
  protected:
   CMPIInstance* make(const CMPIObjectPath* path, const CMPIObjectPath* first, const CMPIObjectPath* second) {
-    return newPair(broker.cmpi(), path, "Left", first, "Right", second, &status);
+    return newPair(operation, path, "Left", first, "Right", second);
   }
 
   RecordingBroker broker;
-  CMPIStatus status{CMPI_RC_OK, nullptr};
+  const std::string category = "Zorvagent.SomeProvider";
+  Operation operation{broker.cmpi(), category, "SomeProvider_References", nullptr, nullptr, nullptr, kStatusOk};
   CMPIObjectPath* association = broker.make(Path("ZORVA_X"), "association");
   CMPIObjectPath* left = broker.make(Path("ZORVA_L"), "left");
   CMPIObjectPath* right = broker.make(Path("ZORVA_R"), "right");
@@ -132,7 +138,7 @@ TEST_F(NewPair, EndWithoutAHandleIsLeftOut) {
 TEST_F(NewPair, ThatCouldNotBeMadeIsWhatTheBrokerGave) {
   broker.failNext("newInstance", Mode::RcAndNull);
   EXPECT_EQ(nullptr, make(association, left, right));
-  EXPECT_EQ(CMPI_RC_ERR_FAILED, status.rc);
+  EXPECT_EQ(CMPI_RC_ERR_FAILED, operation.status.rc);
   broker.failNext("newInstance", Mode::NullHandle);
   const CMPIInstance* lost = make(association, left, right);
   ASSERT_NE(nullptr, lost);
