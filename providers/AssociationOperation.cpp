@@ -73,6 +73,19 @@ bool askForNames(Operation& operation, const CMPIObjectPath* classPath, const CM
          complain(operation, "CBEnumInstanceNames Failed for the target Class", place);
 }
 
+bool askForNames(Operation& operation, const std::string& nameSpace, const char* className, const char* noPath,
+                 const CMPIEnumeration*& names, const Place& place) {
+  const CMPIObjectPath* classPath = newPath(operation.broker, nameSpace, className, &operation.status);
+  return !isMissing(operation, classPath, noPath, place) && askForNames(operation, classPath, names, place);
+}
+
+bool askForInstances(Operation& operation, const std::string& nameSpace, const char* className, const char* noPath,
+                     const CMPIEnumeration*& instances, const Place& place) {
+  const CMPIObjectPath* classPath = newPath(operation.broker, nameSpace, className, &operation.status);
+  return !isMissing(operation, classPath, noPath, place) &&
+         askForInstances(operation, classPath, "CBEnumInstanceNames Failed for the target Class", instances, place);
+}
+
 bool askForInstances(Operation& operation, const CMPIObjectPath* classPath, const char* failed,
                      const CMPIEnumeration*& instances, const Place& place) {
   instances = enumerateInstances(operation.broker, operation.context, classPath, &operation.status);
@@ -94,6 +107,14 @@ CMPIInstance* newPair(Operation& operation, const CMPIObjectPath* association, c
   CMPIInstance* pair = newInstance(operation.broker, association, &operation.status);
   setPair(pair, firstName, first, secondName, second);
   return pair;
+}
+
+bool newBuilt(Operation& operation, const std::string& nameSpace, const char* className, const char* noPath,
+              CMPIInstance*& instance, const Place& place) {
+  const CMPIObjectPath* path = newHostPath(operation.broker, nameSpace, className, &operation.status);
+  if (isMissing(operation, path, noPath, place)) return false;
+  instance = newInstance(operation.broker, path, nullptr);
+  return true;
 }
 
 void returnPairPath(const Operation& operation, CMPIObjectPath* path, const char* firstName,

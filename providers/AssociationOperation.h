@@ -60,9 +60,14 @@ bool fetchServers(Operation& operation, DNSClientObjFactory& factory, const CMPI
 bool fetchServers(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
                   const char** properties, std::vector<CMPIInstance*>& servers);
 
-// Ask the broker for what another provider serves. False, with an error, where the status has a failing code.
+// Ask the broker for what another provider serves. False, with an error, where the status has a failing code. The
+// second and the third ask with a new path of the class, and say noPath where it cannot be made.
 bool askForNames(Operation& operation, const CMPIObjectPath* classPath, const CMPIEnumeration*& names,
                  const Place& place = Place::here());
+bool askForNames(Operation& operation, const std::string& nameSpace, const char* className, const char* noPath,
+                 const CMPIEnumeration*& names, const Place& place = Place::here());
+bool askForInstances(Operation& operation, const std::string& nameSpace, const char* className, const char* noPath,
+                     const CMPIEnumeration*& instances, const Place& place = Place::here());
 bool askForInstances(Operation& operation, const CMPIObjectPath* classPath, const char* failed,
                      const CMPIEnumeration*& instances, const Place& place = Place::here());
 
@@ -78,6 +83,11 @@ void setPair(const CMPIInstance* instance, const char* firstName, const CMPIObje
 // A new instance of an association with its two references; what the broker gave, good or not.
 CMPIInstance* newPair(Operation& operation, const CMPIObjectPath* association, const char* firstName,
                       const CMPIObjectPath* first, const char* secondName, const CMPIObjectPath* second);
+
+// A new instance on this host for a builder; what the broker gave, good or not. False, with the text as an error, where
+// its path cannot be made.
+bool newBuilt(Operation& operation, const std::string& nameSpace, const char* className, const char* noPath,
+              CMPIInstance*& instance, const Place& place = Place::here());
 
 // Hands out an association's path with its two references as keys.
 void returnPairPath(const Operation& operation, CMPIObjectPath* path, const char* firstName,

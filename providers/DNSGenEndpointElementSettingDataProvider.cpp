@@ -2,314 +2,209 @@
 // provider, wholly from the factory. Every endpoint goes with the settings: no key of either end is read.
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSGeneralSettingDataObjects.h"
-#include "providers/AssociationSteps.h"
+#include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"
 #include "providers/Results.h"
 
 namespace ZV {
 
-static const std::string loggerDNSGenEndpointElementSettingData = "Zorvagent.DNSGenEndpointElementSettingDataProvider";
+static const std::string logCategory = "Zorvagent.DNSGenEndpointElementSettingDataProvider";
 static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
 static const char* const dnsGeneralSettingDataClass = "ZORVA_DNSGeneralSettingData";
 static const char* const dnsEndpointElementSettingDataClass = "ZORVA_DNSEndPointElementSettingData";
 static const char* const dnsGenEndpointElementSettingDataClass = "ZORVA_DNSGenEndPointElementSettingData";
 
-// 1, where the settings of single endpoints have 2.
-static void setFlags(const CMPIInstance* instance) {
+// Both references and the flags: 1, where the settings of single endpoints have 2.
+static void setAll(const CMPIInstance* instance, const CMPIObjectPath* endpoint, const CMPIObjectPath* setting) {
+  setPair(instance, "ManagedElement", endpoint, "SettingData", setting);
   setUint16(instance, "IsCurrent", 1);
   setUint16(instance, "IsDefault", 1);
 }
 
-static unsigned short DNSGenEndpointElementSettingDataCMPIInstances(const CMPIObjectPath* ref, const char** properties,
-                                                                    const CMPIContext*,
-                                                                    std::vector<CMPIInstance*>& instances) {
-  ZV_PROVIDER_ENTRY(loggerDNSGenEndpointElementSettingData);
-  CMPIStatus status = kStatusOk;
+static bool DNSGenEndpointElementSettingDataCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
+                                                          const char** properties,
+                                                          std::vector<CMPIInstance*>& instances) {
+  Operation operation = ZV_OPERATION(context, nullptr, ref);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> endpoints;
-  endpoints.reserve(factory.getNumberOfDNSClientInstances());
-  if (factory.getAllDNSClientCMPIObjPaths(broker, ref, endpoints, &status) != 0) {
-    logError(loggerDNSGenEndpointElementSettingData, ZV_HERE,
-             "Can't get ObjectPaths for DNSClient.             Exiting EnumerateInstanceNames");
-    return 1;
+  if (!fetchEndpoints(operation, factory, ref, endpoints)) {
+    return complain(operation, "Can't get ObjectPaths for DNSClient.             Exiting EnumerateInstanceNames");
   }
   std::vector<CMPIObjectPath*> settings;
-  if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &status) != 0) {
-    logError(loggerDNSGenEndpointElementSettingData, ZV_HERE, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
-    ZV_PROVIDER_EXIT(loggerDNSGenEndpointElementSettingData);
-    return 1;
+  if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
+    complain(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
+    markExit(operation);
+    return false;
   }
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  for (unsigned short e = 0; e < count16(endpoints); ++e) {
-    CMPIObjectPath* endpoint = endpoints.at(e);
-    if (isMissing(endpoint, loggerDNSGenEndpointElementSettingData, ZV_HERE, "CMPIObjectPath is NULL for DNS Server")) {
-      return 1;  // the text says Server in the endpoints' loop, and Client in that of the settings
-    }
+  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  for (CMPIObjectPath* endpoint : counted16(endpoints)) {
+    if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Server")) return false;
     setNameSpace(endpoint, nameSpace);  // its host stays as it came
-    for (unsigned short s = 0; s < count16(settings); ++s) {
-      CMPIObjectPath* setting = settings.at(s);
-      if (isMissing(setting, loggerDNSGenEndpointElementSettingData, ZV_HERE,
-                    "CMPIObjectPath is NULL for DNS Client")) {
-        return 1;
-      }
+    for (CMPIObjectPath* setting : counted16(settings)) {
+      if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return false;
       setNameSpaceAndHost(setting, nameSpace);
-      CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsGenEndpointElementSettingDataClass, &status);
-      if (isMissing(path, loggerDNSGenEndpointElementSettingData, ZV_HERE,
-                    "Create CMPIObjectPath failed for                     DNSGenEndpointElementSettingData.")) {
-        return 1;
+      CMPIInstance* instance = nullptr;
+      if (!newBuilt(operation, nameSpace, dnsGenEndpointElementSettingDataClass,
+                    "Create CMPIObjectPath failed for                     DNSGenEndpointElementSettingData.",
+                    instance)) {
+        return false;
       }
-      CMPIInstance* instance = newInstance(broker, path, nullptr);
       if (!isGood(instance)) continue;
       setPropertyFilter(instance, properties, {"ManagedElement", "SettingData"});
-      setReference(instance, "ManagedElement", endpoint);
-      setReference(instance, "SettingData", setting);
-      setFlags(instance);
+      setAll(instance, endpoint, setting);
       instances.push_back(instance);
     }
   }
-  ZV_PROVIDER_EXIT(loggerDNSGenEndpointElementSettingData);
-  return 0;
+  markExit(operation);
+  return true;
 }
 
 // Delivers each path at once: a failure further on leaves what went out, and the result open.
-static CMPIStatus DNSGenEndpointElementSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext*,
+static CMPIStatus DNSGenEndpointElementSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                                      const CMPIResult* result,
                                                                      const CMPIObjectPath* ref) {
-  ZV_PROVIDER_ENTRY(loggerDNSGenEndpointElementSettingData);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> endpoints;
-  endpoints.reserve(factory.getNumberOfDNSClientInstances());
-  if (factory.getAllDNSClientCMPIObjPaths(broker, ref, endpoints, &status) != 0) {
-    logError(loggerDNSGenEndpointElementSettingData, ZV_HERE,
-             "Can't get ObjectPaths for DNSClient.             Exiting EnumerateInstanceNames");
-    return status;
+  if (!fetchEndpoints(operation, factory, ref, endpoints)) {
+    return fail(operation, "Can't get ObjectPaths for DNSClient.             Exiting EnumerateInstanceNames");
   }
   std::vector<CMPIObjectPath*> settings;
-  if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &status) != 0) {
-    logError(loggerDNSGenEndpointElementSettingData, ZV_HERE,
-             "Can't get ObjectPaths for DNSGeneralSettingData.             Exiting EnumerateInstanceNames");
-    return status;
+  if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
+    return fail(operation,
+                "Can't get ObjectPaths for DNSGeneralSettingData.             Exiting EnumerateInstanceNames");
   }
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  for (unsigned short e = 0; e < count16(endpoints); ++e) {
-    CMPIObjectPath* endpoint = endpoints.at(e);
-    if (isMissing(endpoint, loggerDNSGenEndpointElementSettingData, ZV_HERE, "CMPIObjectPath is NULL for DNS Server")) {
-      return status;
-    }
+  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  for (CMPIObjectPath* endpoint : counted16(endpoints)) {
+    if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Server")) return operation.status;
     setNameSpace(endpoint, nameSpace);
-    for (unsigned short s = 0; s < count16(settings); ++s) {
-      CMPIObjectPath* setting = settings.at(s);
-      if (isMissing(setting, loggerDNSGenEndpointElementSettingData, ZV_HERE,
-                    "CMPIObjectPath is NULL for DNSGeneralSettingData")) {
-        return status;
-      }
+    for (CMPIObjectPath* setting : counted16(settings)) {
+      if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNSGeneralSettingData")) return operation.status;
       setNameSpace(setting, nameSpace);  // no host, unlike in the builder
-      CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsGenEndpointElementSettingDataClass, &status);
-      if (isMissing(path, loggerDNSGenEndpointElementSettingData, ZV_HERE,
+      CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsGenEndpointElementSettingDataClass, &operation.status);
+      if (isMissing(operation, path,
                     "Create CMPIObjectPath failed for                     DNSGenEndpointElementSettingData Class.")) {
-        return status;
+        return operation.status;
       }
-      addReferenceKey(path, "ManagedElement", endpoint);
-      addReferenceKey(path, "SettingData", setting);
-      returnObjectPath(result, path);
+      returnPairPath(operation, path, "ManagedElement", endpoint, "SettingData", setting);
     }
   }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGenEndpointElementSettingData);
-  return status;
+  return end(operation);
 }
 
 static CMPIStatus DNSGenEndpointElementSettingData_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                                  const CMPIResult* result, const CMPIObjectPath* ref,
                                                                  const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSGenEndpointElementSettingData);
-  std::vector<CMPIInstance*> instances;
-  if (DNSGenEndpointElementSettingDataCMPIInstances(ref, properties, context, instances) == 0) {
-    returnAll(result, instances);
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGenEndpointElementSettingData);
-  return kStatusOk;
+  const Operation operation = ZV_OPERATION(context, result, ref);
+  returnBuilt(operation, DNSGenEndpointElementSettingDataCMPIInstances, properties);
+  return end(operation);
 }
 
 static CMPIStatus DNSGenEndpointElementSettingData_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
                                                                const CMPIResult* result, const CMPIObjectPath* ref,
                                                                const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSGenEndpointElementSettingData);
-  CMPIStatus status = kStatusOk;
-  std::vector<CMPIInstance*> instances;
-  if (keyCountOf(ref, &status) == 0) {
-    logError(loggerDNSGenEndpointElementSettingData, ZV_HERE, "At least one key should be passed");
-  } else if (DNSGenEndpointElementSettingDataCMPIInstances(ref, properties, context, instances) == 0) {
-    returnFirstEqual(result, ref, instances, true, &status);
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGenEndpointElementSettingData);
-  return status;
+  Operation operation = ZV_OPERATION(context, result, ref);
+  returnEqualBuilt(operation, DNSGenEndpointElementSettingDataCMPIInstances, properties);
+  return end(operation);
 }
 
-static CMPIStatus DNSGenEndpointElementSettingData_Associators(CMPIAssociationMI*, const CMPIContext*,
+static CMPIStatus DNSGenEndpointElementSettingData_Associators(CMPIAssociationMI*, const CMPIContext* context,
                                                                const CMPIResult* result, const CMPIObjectPath* ref,
                                                                const char* assocClass, const char* resultClass,
                                                                const char*, const char*, const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSGenEndpointElementSettingData);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd = factory.get_assoc_targetClass_ObjectPath(
-      broker, ref, associationOr(assocClass, dnsGenEndpointElementSettingDataClass), resultClass, &status);
-  if (isMissing(farEnd, loggerDNSGenEndpointElementSettingData, ZV_HERE, "Object Path is NULL in Associators.")) {
-    return status;
-  }
-  const std::string farEndClass = classNameOf(farEnd, &status);
+  const FarEnd farEnd =
+      resolveFarEnd(operation, factory, associationOr(assocClass, dnsGenEndpointElementSettingDataClass), resultClass,
+                    "Object Path is NULL in Associators.");
+  if (!isGood(farEnd.path)) return operation.status;
   std::vector<CMPIInstance*> instances;
-  if (farEndClass == dnsProtocolEndPointClass) {
-    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndpoint")) return status;
-    instances.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIInstances(broker, farEnd, properties, false, instances, &status) != 0) {
-      return status;  // without a word of its own
-    }
-  } else if (farEndClass == dnsGeneralSettingDataClass) {
-    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) return status;
-    if (getAllDNSGeneralSettingDataCMPIInstances(broker, ref, properties, &instances, &status) != 0) {
-      logError(loggerDNSGenEndpointElementSettingData, ZV_HERE, "getAllDNSGeneralSettingDataCMPIInstances Failed");
-      return status;
+  if (farEnd.className == dnsProtocolEndPointClass) {
+    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndpoint")) return operation.status;
+    if (!fetchEndpoints(operation, factory, farEnd.path, properties, instances)) return operation.status;
+  } else if (farEnd.className == dnsGeneralSettingDataClass) {
+    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData"))
+      return operation.status;
+    if (getAllDNSGeneralSettingDataCMPIInstances(broker, ref, properties, &instances, &operation.status) != 0) {
+      return fail(operation, "getAllDNSGeneralSettingDataCMPIInstances Failed");
     }
   }
   returnAll(result, instances);
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGenEndpointElementSettingData);
-  return status;
+  return end(operation);
 }
 
-static CMPIStatus DNSGenEndpointElementSettingData_AssociatorNames(CMPIAssociationMI*, const CMPIContext*,
+static CMPIStatus DNSGenEndpointElementSettingData_AssociatorNames(CMPIAssociationMI*, const CMPIContext* context,
                                                                    const CMPIResult* result, const CMPIObjectPath* ref,
                                                                    const char* assocClass, const char* resultClass,
                                                                    const char*, const char*) {
-  ZV_PROVIDER_ENTRY(loggerDNSGenEndpointElementSettingData);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd = factory.get_assoc_targetClass_ObjectPath(
-      broker, ref, associationOr(assocClass, dnsGenEndpointElementSettingDataClass), resultClass, &status);
-  if (isMissing(farEnd, loggerDNSGenEndpointElementSettingData, ZV_HERE, "Object Path is NULL in Associators.")) {
-    return status;  // the text of the associators
-  }
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == dnsProtocolEndPointClass) {
-    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndpoint")) return status;
+  const FarEnd farEnd =
+      resolveFarEnd(operation, factory, associationOr(assocClass, dnsGenEndpointElementSettingDataClass), resultClass,
+                    "Object Path is NULL in Associators.");
+  if (!isGood(farEnd.path)) return operation.status;
+  if (farEnd.className == dnsProtocolEndPointClass) {
+    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndpoint")) return operation.status;
     std::vector<CMPIObjectPath*> endpoints;
-    endpoints.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIObjPaths(broker, farEnd, endpoints, &status) != 0) return status;
-    const std::string nameSpace = nameSpaceOf(ref, &status);
-    for (unsigned short i = 0; i < count16(endpoints); ++i) {
-      setNameSpaceAndHost(endpoints.at(i), nameSpace);
-      returnObjectPath(result, endpoints.at(i));
+    if (!fetchEndpoints(operation, factory, farEnd.path, endpoints)) return operation.status;
+    const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+    for (CMPIObjectPath* endpoint : counted16(endpoints)) {
+      setNameSpaceAndHost(endpoint, nameSpace);
+      returnObjectPath(result, endpoint);
     }
-  } else if (farEndClass == dnsGeneralSettingDataClass) {
-    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) return status;
+  } else if (farEnd.className == dnsGeneralSettingDataClass) {
+    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData"))
+      return operation.status;
     std::vector<CMPIObjectPath*> settings;
-    if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &status) != 0) {
-      logError(loggerDNSGenEndpointElementSettingData, ZV_HERE, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
-      return status;
+    if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
+      return fail(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
     }
     returnAll(result, settings);
   }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGenEndpointElementSettingData);
-  return status;
+  return end(operation);
 }
 
-static CMPIStatus DNSGenEndpointElementSettingData_References(CMPIAssociationMI*, const CMPIContext*,
+static CMPIStatus refer(Operation operation, const char* madeClass, Deliver deliver) {
+  DNSClientObjFactory factory;
+  const auto [farEnd, nameSpace, association] =
+      resolveReferences(operation, factory, dnsGenEndpointElementSettingDataClass, newPath, madeClass,
+                        "Object Path is NULL in References.");
+  if (!isGood(farEnd.path)) return operation.status;
+  if (farEnd.className == dnsGeneralSettingDataClass) {
+    std::vector<CMPIObjectPath*> settings;
+    if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, farEnd.path, &settings, &operation.status) != 0) {
+      return fail(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
+    }
+    for (CMPIObjectPath* setting : counted16(settings)) {
+      setNameSpaceAndHost(setting, nameSpace);
+      const CMPIInstance* reference = newInstance(broker, association, &operation.status);
+      setAll(reference, operation.ref, setting);
+      deliver(operation, reference, nameSpace);
+    }
+  } else if (farEnd.className == dnsProtocolEndPointClass) {
+    std::vector<CMPIObjectPath*> endpoints;
+    if (!fetchEndpoints(operation, factory, farEnd.path, endpoints)) return operation.status;
+    for (CMPIObjectPath* endpoint : counted16(endpoints)) {
+      setNameSpaceAndHost(endpoint, nameSpace);
+      const CMPIInstance* reference = newInstance(broker, association, &operation.status);
+      setAll(reference, endpoint, operation.ref);
+      deliver(operation, reference, nameSpace);
+    }
+  }
+  return end(operation);
+}
+
+static CMPIStatus DNSGenEndpointElementSettingData_References(CMPIAssociationMI*, const CMPIContext* context,
                                                               const CMPIResult* result, const CMPIObjectPath* ref,
                                                               const char*, const char*, const char**) {
-  ZV_PROVIDER_ENTRY(loggerDNSGenEndpointElementSettingData);
-  CMPIStatus status = kStatusOk;
-  DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd =
-      factory.get_assoc_targetClass_ObjectPath(broker, ref, dnsGenEndpointElementSettingDataClass, nullptr, &status);
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* association = newPath(broker, nameSpace, dnsGenEndpointElementSettingDataClass, &status);  // no host
-  if (isMissing(farEnd, loggerDNSGenEndpointElementSettingData, ZV_HERE, "Object Path is NULL in References.")) {
-    return status;
-  }
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == dnsGeneralSettingDataClass) {
-    std::vector<CMPIObjectPath*> settings;
-    if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, farEnd, &settings, &status) != 0) {
-      logError(loggerDNSGenEndpointElementSettingData, ZV_HERE, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
-      return status;
-    }
-    for (unsigned short i = 0; i < count16(settings); ++i) {
-      setNameSpaceAndHost(settings.at(i), nameSpace);
-      CMPIInstance* reference =
-          newPair(broker, association, "ManagedElement", ref, "SettingData", settings.at(i), &status);
-      setFlags(reference);
-      returnInstance(result, reference);
-    }
-  } else if (farEndClass == dnsProtocolEndPointClass) {
-    std::vector<CMPIObjectPath*> endpoints;
-    endpoints.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIObjPaths(broker, farEnd, endpoints, &status) != 0) return status;
-    for (unsigned short i = 0; i < count16(endpoints); ++i) {
-      setNameSpaceAndHost(endpoints.at(i), nameSpace);
-      CMPIInstance* reference =
-          newPair(broker, association, "ManagedElement", endpoints.at(i), "SettingData", ref, &status);
-      setFlags(reference);
-      returnInstance(result, reference);
-    }
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGenEndpointElementSettingData);
-  return status;
+  return refer(ZV_OPERATION(context, result, ref), dnsGenEndpointElementSettingDataClass, deliverInstance);
 }
 
-// The paths that go out are of the sister association's class, the one of single endpoints' settings.
-static CMPIStatus DNSGenEndpointElementSettingData_ReferenceNames(CMPIAssociationMI*, const CMPIContext*,
+// The paths are of the sister association's class, the one of single endpoints' settings.
+static CMPIStatus DNSGenEndpointElementSettingData_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
                                                                   const CMPIResult* result, const CMPIObjectPath* ref,
                                                                   const char*, const char*) {
-  ZV_PROVIDER_ENTRY(loggerDNSGenEndpointElementSettingData);
-  CMPIStatus status = kStatusOk;
-  DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd =
-      factory.get_assoc_targetClass_ObjectPath(broker, ref, dnsGenEndpointElementSettingDataClass, nullptr, &status);
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* association = newPath(broker, nameSpace, dnsEndpointElementSettingDataClass, &status);
-  if (isMissing(farEnd, loggerDNSGenEndpointElementSettingData, ZV_HERE, "Object Path is NULL in References.")) {
-    return status;  // the text of the references
-  }
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == dnsGeneralSettingDataClass) {
-    std::vector<CMPIObjectPath*> settings;
-    if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, farEnd, &settings, &status) != 0) {
-      logError(loggerDNSGenEndpointElementSettingData, ZV_HERE, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
-      return status;
-    }
-    for (unsigned short i = 0; i < count16(settings); ++i) {
-      setNameSpaceAndHost(settings.at(i), nameSpace);
-      CMPIInstance* reference =
-          newPair(broker, association, "ManagedElement", ref, "SettingData", settings.at(i), &status);
-      setFlags(reference);
-      CMPIObjectPath* path = objectPathOf(reference, &status);
-      setNameSpace(path, nameSpace);
-      returnObjectPath(result, path);
-    }
-  } else if (farEndClass == dnsProtocolEndPointClass) {
-    std::vector<CMPIObjectPath*> endpoints;
-    endpoints.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIObjPaths(broker, farEnd, endpoints, &status) != 0) return status;
-    for (unsigned short i = 0; i < count16(endpoints); ++i) {
-      setNameSpaceAndHost(endpoints.at(i), nameSpace);
-      CMPIInstance* reference =
-          newPair(broker, association, "ManagedElement", endpoints.at(i), "SettingData", ref, &status);
-      setFlags(reference);
-      CMPIObjectPath* path = objectPathOf(reference, &status);
-      setNameSpace(path, nameSpace);
-      returnObjectPath(result, path);
-    }
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGenEndpointElementSettingData);
-  return status;
+  return refer(ZV_OPERATION(context, result, ref), dnsEndpointElementSettingDataClass, deliverPath);
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSGenEndpointElementSettingData)

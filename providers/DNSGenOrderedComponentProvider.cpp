@@ -5,18 +5,22 @@
 
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSGeneralSettingDataObjects.h"
-#include "providers/AssociationSteps.h"
+#include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"
 #include "providers/Results.h"
 
 namespace ZV {
 
-static const std::string loggerDNSGeneralOrderedComponent = "Zorvagent.DNSGeneralOrderedComponentProvider";
+static const std::string logCategory = "Zorvagent.DNSGeneralOrderedComponentProvider";
 static const char* const dnsGeneralSettingDataClass = "ZORVA_DNSGeneralSettingData";
 static const char* const dnsGenOrderedComponentClass = "ZORVA_DNSGenOrderedComponent";
 static const char* const ipAssignmentSettingDataClass = "ZORVA_IPAssignmentSettingData";
 
-static constexpr CMPIUint64 kAssignedSequence = 1;  // the interface's own settings come second
+// Both references and the place: the interface's own settings come second.
+static void setAll(const CMPIInstance* instance, const CMPIObjectPath* group, const CMPIObjectPath* part) {
+  setPair(instance, "GroupComponent", group, "PartComponent", part);
+  setUint64(instance, "AssignedSequence", 1);
+}
 
 // Throws out of range where there are none; the provider lets that pass, and a server reports a failed operation with
 // this text.
@@ -26,98 +30,66 @@ static CMPIObjectPath* firstOf(const std::vector<CMPIObjectPath*>& settings) {
 }
 
 // Without host-wide settings, and with an IP assignment to pair them with, std::out_of_range leaves this function.
-static unsigned short DNSGeneralOrderedComponentCMPIInstances(const CMPIObjectPath* ref, const char** properties,
-                                                              const CMPIContext* context,
-                                                              std::vector<CMPIInstance*>& instances) {
-  // Two equal signs in this source alone.
-  logEntry(loggerDNSGeneralOrderedComponent, ZV_HERE, " ref==", ref, " properties==", properties, " ctx==", context,
-           " instances==", &instances);
-  CMPIStatus status = kStatusOk;
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* assignmentClass = newPath(broker, nameSpace, ipAssignmentSettingDataClass, &status);
-  if (isMissing(assignmentClass, loggerDNSGeneralOrderedComponent, ZV_HERE,
-                "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.")) {
-    return 1;
-  }
-  const CMPIEnumeration* assignments = enumerateInstanceNames(broker, context, assignmentClass, &status);
-  if (status.rc != CMPI_RC_OK) {
-    logError(loggerDNSGeneralOrderedComponent, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-    return 1;
+static bool DNSGeneralOrderedComponentCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
+                                                    const char** properties, std::vector<CMPIInstance*>& instances) {
+  Operation operation = ZV_UNMARKED_OPERATION(context, nullptr, ref);
+  const FlowLog flow(logCategory, ZV_HERE, " ref==", ref, " properties==", properties, " ctx==", context,
+                     " instances==", &instances);
+  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  const CMPIEnumeration* assignments = nullptr;
+  if (!askForNames(operation, nameSpace, ipAssignmentSettingDataClass,
+                   "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.", assignments)) {
+    return false;
   }
   std::vector<CMPIObjectPath*> settings;
-  if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &status) != 0) {
-    logError(loggerDNSGeneralOrderedComponent, ZV_HERE, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
-    ZV_PROVIDER_EXIT(loggerDNSGeneralOrderedComponent);
-    return 1;
+  if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
+    complain(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
+    markExit(operation);
+    return false;
   }
-  while (hasNext(assignments, &status)) {
-    const CMPIObjectPath* assignment = nextPath(assignments, &status);
-    keyText(assignment, "InstanceID", &status);  // read, as the other below, and compared with nothing
+  while (hasNext(assignments, &operation.status)) {
+    const CMPIObjectPath* assignment = nextPath(assignments, &operation.status);
+    keyText(assignment, "InstanceID", &operation.status);  // read, as the other below, and compared with nothing
     CMPIObjectPath* setting = firstOf(settings);
-    if (isMissing(setting, loggerDNSGeneralOrderedComponent, ZV_HERE, "CMPIObjectPath is NULL for DNS Client")) {
-      return 1;
-    }
-    keyText(setting, "InstanceID", &status);
+    if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return false;
+    keyText(setting, "InstanceID", &operation.status);
     setNameSpaceAndHost(setting, nameSpace);
-    CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsGenOrderedComponentClass, &status);
-    if (isMissing(path, loggerDNSGeneralOrderedComponent, ZV_HERE,
-                  "Create CMPIObjectPath failed for                     DNSGeneralOrderedComponent.")) {
-      return 1;
+    CMPIInstance* instance = nullptr;
+    if (!newBuilt(operation, nameSpace, dnsGenOrderedComponentClass,
+                  "Create CMPIObjectPath failed for                     DNSGeneralOrderedComponent.", instance)) {
+      return false;
     }
-    CMPIInstance* instance = newInstance(broker, path, nullptr);
     if (!isGood(instance)) continue;
     setPropertyFilter(instance, properties, {"GroupComponent", "PartComponent"});
-    setReference(instance, "GroupComponent", assignment);
-    setReference(instance, "PartComponent", setting);
-    setUint64(instance, "AssignedSequence", kAssignedSequence);
+    setAll(instance, assignment, setting);
     instances.push_back(instance);
   }
-  logExit(loggerDNSGeneralOrderedComponent, ZV_HERE, " ref==", ref, " properties==", properties, " ctx==", context,
-          " instances==", &instances);
-  return 0;
+  flow.exit();
+  return true;
 }
 
-// Unlike most siblings by way of the builder: nothing goes out before all is built.
+// The paths of what is built: nothing goes out before all is built.
 static CMPIStatus DNSGeneralOrderedComponent_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                                const CMPIResult* result, const CMPIObjectPath* ref) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralOrderedComponent);
-  CMPIStatus status = kStatusOk;
-  std::vector<CMPIInstance*> instances;
-  if (DNSGeneralOrderedComponentCMPIInstances(ref, nullptr, context, instances) == 0) {
-    returnPathsOf(result, instances, &status);
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralOrderedComponent);
-  return status;
+  Operation operation = ZV_OPERATION(context, result, ref);
+  returnPathsOfBuilt(operation, DNSGeneralOrderedComponentCMPIInstances);
+  return end(operation);
 }
 
 static CMPIStatus DNSGeneralOrderedComponent_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                            const CMPIResult* result, const CMPIObjectPath* ref,
                                                            const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralOrderedComponent);
-  std::vector<CMPIInstance*> instances;
-  if (DNSGeneralOrderedComponentCMPIInstances(ref, properties, context, instances) == 0) {
-    returnAll(result, instances);
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralOrderedComponent);
-  return kStatusOk;
+  const Operation operation = ZV_OPERATION(context, result, ref);
+  returnBuilt(operation, DNSGeneralOrderedComponentCMPIInstances, properties);
+  return end(operation);
 }
 
 static CMPIStatus DNSGeneralOrderedComponent_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
                                                          const CMPIResult* result, const CMPIObjectPath* ref,
                                                          const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralOrderedComponent);
-  CMPIStatus status = kStatusOk;
-  std::vector<CMPIInstance*> instances;
-  if (keyCountOf(ref, &status) == 0) {
-    logError(loggerDNSGeneralOrderedComponent, ZV_HERE, "At least one key should be passed");
-  } else if (DNSGeneralOrderedComponentCMPIInstances(ref, properties, context, instances) == 0) {
-    returnFirstEqual(result, ref, instances, true, &status);
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralOrderedComponent);
-  return status;
+  Operation operation = ZV_OPERATION(context, result, ref);
+  returnEqualBuilt(operation, DNSGeneralOrderedComponentCMPIInstances, properties);
+  return end(operation);
 }
 
 // No key of the source is read in the four operations below: every object of the far end counts.
@@ -126,179 +98,103 @@ static CMPIStatus DNSGeneralOrderedComponent_Associators(CMPIAssociationMI*, con
                                                          const CMPIResult* result, const CMPIObjectPath* ref,
                                                          const char* assocClass, const char* resultClass, const char*,
                                                          const char*, const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralOrderedComponent);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd = factory.get_assoc_targetClass_ObjectPath(
-      broker, ref, associationOr(assocClass, dnsGenOrderedComponentClass), resultClass, &status);
-  if (isMissing(farEnd, loggerDNSGeneralOrderedComponent, ZV_HERE, "Object Path is NULL in Associators.")) {
-    return status;
-  }
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == ipAssignmentSettingDataClass) {
-    if (!passesResultClass(resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData")) return status;
-    CMPIObjectPath* assignmentClass = newPath(broker, nameSpaceOf(ref, &status), ipAssignmentSettingDataClass, &status);
-    if (isMissing(assignmentClass, loggerDNSGeneralOrderedComponent, ZV_HERE,
-                  "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.")) {
-      return status;
+  const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsGenOrderedComponentClass),
+                                      resultClass, "Object Path is NULL in Associators.");
+  if (!isGood(farEnd.path)) return operation.status;
+  if (farEnd.className == ipAssignmentSettingDataClass) {
+    if (!passesResultClass(resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData"))
+      return operation.status;
+    const CMPIEnumeration* assignments = nullptr;
+    if (!askForInstances(operation, nameSpaceOf(ref, &operation.status), ipAssignmentSettingDataClass,
+                         "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.", assignments)) {
+      return operation.status;
     }
-    const CMPIEnumeration* assignments = enumerateInstances(broker, context, assignmentClass, &status);
-    if (status.rc != CMPI_RC_OK) {  // the text names the other call
-      logError(loggerDNSGeneralOrderedComponent, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(assignments, &status)) returnInstance(result, nextInstance(assignments, &status));
-  } else if (farEndClass == dnsGeneralSettingDataClass) {
-    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) return status;
+    while (hasNext(assignments, &operation.status))
+      returnInstance(result, nextInstance(assignments, &operation.status));
+  } else if (farEnd.className == dnsGeneralSettingDataClass) {
+    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData"))
+      return operation.status;
     std::vector<CMPIInstance*> settings;
-    if (getAllDNSGeneralSettingDataCMPIInstances(broker, ref, properties, &settings, &status) != 0) {
-      logError(loggerDNSGeneralOrderedComponent, ZV_HERE, "getAllDNSGeneralSettingDataCMPIInstances Failed");
-      return status;
+    if (getAllDNSGeneralSettingDataCMPIInstances(broker, ref, properties, &settings, &operation.status) != 0) {
+      return fail(operation, "getAllDNSGeneralSettingDataCMPIInstances Failed");
     }
     returnAll(result, settings);
   }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralOrderedComponent);
-  return status;
+  return end(operation);
 }
 
 static CMPIStatus DNSGeneralOrderedComponent_AssociatorNames(CMPIAssociationMI*, const CMPIContext* context,
                                                              const CMPIResult* result, const CMPIObjectPath* ref,
                                                              const char* assocClass, const char* resultClass,
                                                              const char*, const char*) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralOrderedComponent);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd = factory.get_assoc_targetClass_ObjectPath(
-      broker, ref, associationOr(assocClass, dnsGenOrderedComponentClass), resultClass, &status);
-  if (isMissing(farEnd, loggerDNSGeneralOrderedComponent, ZV_HERE, "Object Path is NULL in Associators.")) {
-    return status;  // the text of the associators
-  }
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == ipAssignmentSettingDataClass) {
-    if (!passesResultClass(resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData")) return status;
-    CMPIObjectPath* assignmentClass = newPath(broker, nameSpaceOf(ref, &status), ipAssignmentSettingDataClass, &status);
-    if (isMissing(assignmentClass, loggerDNSGeneralOrderedComponent, ZV_HERE,  // a class that is not touched here
-                  "Create CMPIObjectPath failed for ComputerSystem.")) {
-      return status;
+  const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsGenOrderedComponentClass),
+                                      resultClass, "Object Path is NULL in Associators.");
+  if (!isGood(farEnd.path)) return operation.status;
+  if (farEnd.className == ipAssignmentSettingDataClass) {
+    if (!passesResultClass(resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData"))
+      return operation.status;
+    const CMPIEnumeration* assignments = nullptr;
+    if (!askForNames(operation, nameSpaceOf(ref, &operation.status), ipAssignmentSettingDataClass,
+                     "Create CMPIObjectPath failed for ComputerSystem.", assignments)) {
+      return operation.status;
     }
-    const CMPIEnumeration* assignments = enumerateInstanceNames(broker, context, assignmentClass, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSGeneralOrderedComponent, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(assignments, &status)) returnObjectPath(result, nextPath(assignments, &status));
-  } else if (farEndClass == dnsGeneralSettingDataClass) {
-    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) return status;
+    while (hasNext(assignments, &operation.status)) returnObjectPath(result, nextPath(assignments, &operation.status));
+  } else if (farEnd.className == dnsGeneralSettingDataClass) {
+    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData"))
+      return operation.status;
     std::vector<CMPIObjectPath*> settings;
-    if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &status) != 0) {
-      logError(loggerDNSGeneralOrderedComponent, ZV_HERE, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
-      return status;
+    if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
+      return fail(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
     }
     returnAll(result, settings);
   }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralOrderedComponent);
-  return status;
+  return end(operation);
+}
+
+static CMPIStatus refer(Operation operation, Deliver deliver) {
+  DNSClientObjFactory factory;
+  const auto [farEnd, nameSpace, association] =
+      resolveReferences(operation, factory, dnsGenOrderedComponentClass, newPath, dnsGenOrderedComponentClass,
+                        "Object Path is NULL in References.");
+  if (!isGood(farEnd.path)) return operation.status;
+  if (farEnd.className == dnsGeneralSettingDataClass) {
+    std::vector<CMPIObjectPath*> settings;
+    if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, farEnd.path, &settings, &operation.status) != 0) {
+      return fail(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
+    }
+    for (CMPIObjectPath* setting : counted16(settings)) {  // every one, not only the first as in the builder
+      const CMPIInstance* reference = newInstance(broker, association, &operation.status);
+      setNameSpaceAndHost(setting, nameSpace);
+      setAll(reference, operation.ref, setting);
+      deliver(operation, reference, nameSpace);
+    }
+  } else if (farEnd.className == ipAssignmentSettingDataClass) {
+    const CMPIEnumeration* assignments = nullptr;
+    if (!askForNames(operation, farEnd.path, assignments)) return operation.status;
+    while (hasNext(assignments, &operation.status)) {
+      nextPath(assignments, &operation.status);  // only counted: each part is the far end's class without keys
+      const CMPIInstance* reference = newInstance(broker, association, &operation.status);
+      setAll(reference, operation.ref, farEnd.path);  // the source is the group, the reverse of the builder
+      deliver(operation, reference, nameSpace);
+    }
+  }
+  return end(operation);
 }
 
 static CMPIStatus DNSGeneralOrderedComponent_References(CMPIAssociationMI*, const CMPIContext* context,
                                                         const CMPIResult* result, const CMPIObjectPath* ref,
                                                         const char*, const char*, const char**) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralOrderedComponent);
-  CMPIStatus status = kStatusOk;
-  DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd =
-      factory.get_assoc_targetClass_ObjectPath(broker, ref, dnsGenOrderedComponentClass, nullptr, &status);
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* association = newPath(broker, nameSpace, dnsGenOrderedComponentClass, &status);  // no host
-  if (isMissing(farEnd, loggerDNSGeneralOrderedComponent, ZV_HERE, "Object Path is NULL in References.")) {
-    return status;
-  }
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == dnsGeneralSettingDataClass) {
-    std::vector<CMPIObjectPath*> settings;
-    if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, farEnd, &settings, &status) != 0) {
-      logError(loggerDNSGeneralOrderedComponent, ZV_HERE, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
-      return status;
-    }
-    for (unsigned short i = 0; i < count16(settings); ++i) {  // every one, not only the first as in the builder
-      CMPIObjectPath* setting = settings.at(i);
-      CMPIInstance* reference = newInstance(broker, association, &status);
-      setNameSpaceAndHost(setting, nameSpace);
-      setReference(reference, "GroupComponent", ref);
-      setReference(reference, "PartComponent", setting);
-      setUint64(reference, "AssignedSequence", kAssignedSequence);
-      returnInstance(result, reference);
-    }
-  } else if (farEndClass == ipAssignmentSettingDataClass) {
-    const CMPIEnumeration* assignments = enumerateInstanceNames(broker, context, farEnd, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSGeneralOrderedComponent, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(assignments, &status)) {
-      nextPath(assignments, &status);  // only counted: each part is the far end's class without keys, and the source
-                                       // stands as the group, the reverse of the builder
-      CMPIInstance* reference = newPair(broker, association, "GroupComponent", ref, "PartComponent", farEnd, &status);
-      setUint64(reference, "AssignedSequence", kAssignedSequence);
-      returnInstance(result, reference);
-    }
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralOrderedComponent);
-  return status;
+  return refer(ZV_OPERATION(context, result, ref), deliverInstance);
 }
 
 static CMPIStatus DNSGeneralOrderedComponent_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
                                                             const CMPIResult* result, const CMPIObjectPath* ref,
                                                             const char*, const char*) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralOrderedComponent);
-  CMPIStatus status = kStatusOk;
-  DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd =
-      factory.get_assoc_targetClass_ObjectPath(broker, ref, dnsGenOrderedComponentClass, nullptr, &status);
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* association = newPath(broker, nameSpace, dnsGenOrderedComponentClass, &status);
-  if (isMissing(farEnd, loggerDNSGeneralOrderedComponent, ZV_HERE, "Object Path is NULL in References.")) {
-    return status;  // the text of the references
-  }
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == dnsGeneralSettingDataClass) {
-    std::vector<CMPIObjectPath*> settings;
-    if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, farEnd, &settings, &status) != 0) {
-      logError(loggerDNSGeneralOrderedComponent, ZV_HERE, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
-      return status;
-    }
-    for (unsigned short i = 0; i < count16(settings); ++i) {
-      CMPIObjectPath* setting = settings.at(i);
-      CMPIInstance* reference = newInstance(broker, association, &status);
-      setNameSpaceAndHost(setting, nameSpace);
-      setReference(reference, "GroupComponent", ref);
-      setReference(reference, "PartComponent", setting);
-      setUint64(reference, "AssignedSequence", kAssignedSequence);
-      CMPIObjectPath* path = objectPathOf(reference, &status);
-      setNameSpace(path, nameSpace);
-      returnObjectPath(result, path);
-    }
-  } else if (farEndClass == ipAssignmentSettingDataClass) {
-    const CMPIEnumeration* assignments = enumerateInstanceNames(broker, context, farEnd, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSGeneralOrderedComponent, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(assignments, &status)) {
-      nextPath(assignments, &status);  // as in the references
-      CMPIInstance* reference = newPair(broker, association, "GroupComponent", ref, "PartComponent", farEnd, &status);
-      setUint64(reference, "AssignedSequence", kAssignedSequence);
-      CMPIObjectPath* path = objectPathOf(reference, &status);
-      setNameSpace(path, nameSpace);
-      returnObjectPath(result, path);
-    }
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralOrderedComponent);
-  return status;
+  return refer(ZV_OPERATION(context, result, ref), deliverPath);
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSGeneralOrderedComponent)

@@ -1,157 +1,119 @@
 // ZORVA_DNSGeneralElementSettingData: the host-wide DNS settings of the computer system. Instance and association
 // provider; the computer systems are served elsewhere and asked for through the broker.
 //
-// The enumerations pair what belongs together: a system whose Name stands anywhere in the settings' InstanceID. The
-// association operations apply no key at all.
+// The enumerations pair a system with settings whose InstanceID holds its Name. The association operations apply no key
+// at all.
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSGeneralSettingDataObjects.h"
-#include "providers/AssociationSteps.h"
+#include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"
 #include "providers/Results.h"
 
 namespace ZV {
 
-static const std::string loggerDNSGeneralElementSettingData = "Zorvagent.DNSGeneralElementSettingDataProvider";
+static const std::string logCategory = "Zorvagent.DNSGeneralElementSettingDataProvider";
 static const char* const computerSystemClass = "ZORVA_ComputerSystem";
 static const char* const dnsGeneralSettingDataClass = "ZORVA_DNSGeneralSettingData";
 static const char* const dnsGeneralElementSettingDataClass = "ZORVA_DNSGeneralElementSettingData";
 
-// 1, where the settings of single endpoints have 2.
-static void setFlags(const CMPIInstance* instance) {
+// Both references and the flags: 1, where the settings of single endpoints have 2.
+static void setAll(const CMPIInstance* instance, const CMPIObjectPath* system, const CMPIObjectPath* setting) {
+  setPair(instance, "ManagedElement", system, "SettingData", setting);
   setUint16(instance, "IsCurrent", 1);
   setUint16(instance, "IsDefault", 1);
 }
 
-static unsigned short DNSGeneralElementSettingDataCMPIInstances(const CMPIObjectPath* ref, const char** properties,
-                                                                const CMPIContext* context,
-                                                                std::vector<CMPIInstance*>& instances) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralElementSettingData);
-  CMPIStatus status = kStatusOk;
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* systemClass = newPath(broker, nameSpace, computerSystemClass, &status);
-  if (isMissing(systemClass, loggerDNSGeneralElementSettingData, ZV_HERE,
-                "Create CMPIObjectPath failed for ComputerSystem.")) {
-    return 1;
-  }
-  const CMPIEnumeration* systems = enumerateInstanceNames(broker, context, systemClass, &status);
-  if (status.rc != CMPI_RC_OK) {
-    logError(loggerDNSGeneralElementSettingData, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-    return 1;
+static bool DNSGeneralElementSettingDataCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
+                                                      const char** properties, std::vector<CMPIInstance*>& instances) {
+  Operation operation = ZV_OPERATION(context, nullptr, ref);
+  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  const CMPIEnumeration* systems = nullptr;
+  if (!askForNames(operation, nameSpace, computerSystemClass, "Create CMPIObjectPath failed for ComputerSystem.",
+                   systems)) {
+    return false;
   }
   std::vector<CMPIObjectPath*> settings;
-  if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &status) != 0) {
-    logError(loggerDNSGeneralElementSettingData, ZV_HERE, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
-    ZV_PROVIDER_EXIT(loggerDNSGeneralElementSettingData);
-    return 1;
+  if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
+    complain(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
+    markExit(operation);
+    return false;
   }
-  while (hasNext(systems, &status)) {
-    const CMPIObjectPath* system = nextPath(systems, &status);
-    const std::string name = keyText(system, "Name", &status);
-    for (unsigned short i = 0; i < count16(settings); ++i) {
-      CMPIObjectPath* setting = settings.at(i);
-      if (isMissing(setting, loggerDNSGeneralElementSettingData, ZV_HERE, "CMPIObjectPath is NULL for DNS Client")) {
-        return 1;  // the text says Client, though the path is of setting data
-      }
-      if (keyText(setting, "InstanceID", &status).find(name) == std::string::npos) continue;  // without a word
+  while (hasNext(systems, &operation.status)) {
+    const CMPIObjectPath* system = nextPath(systems, &operation.status);
+    const std::string name = keyText(system, "Name", &operation.status);
+    for (CMPIObjectPath* setting : counted16(settings)) {
+      if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return false;
+      if (keyText(setting, "InstanceID", &operation.status).find(name) == std::string::npos) continue;
       setNameSpaceAndHost(setting, nameSpace);
-      CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsGeneralElementSettingDataClass, &status);
-      if (isMissing(path, loggerDNSGeneralElementSettingData, ZV_HERE,
-                    "Create CMPIObjectPath failed for                         DNSGeneralElementSettingData.")) {
-        return 1;
+      CMPIInstance* instance = nullptr;
+      if (!newBuilt(operation, nameSpace, dnsGeneralElementSettingDataClass,
+                    "Create CMPIObjectPath failed for                         DNSGeneralElementSettingData.",
+                    instance)) {
+        return false;
       }
-      CMPIInstance* instance = newInstance(broker, path, nullptr);
-      if (!isGood(instance)) {
-        logError(loggerDNSGeneralElementSettingData, ZV_HERE, "Key is not matched");
-        continue;
+      if (isGood(instance)) {
+        setPropertyFilter(instance, properties, {"ManagedElement", "SettingData"});
+        setAll(instance, system, setting);
+        instances.push_back(instance);
+      } else {
+        complain(operation, "Key is not matched");
       }
-      setPropertyFilter(instance, properties, {"ManagedElement", "SettingData"});
-      setReference(instance, "ManagedElement", system);
-      setReference(instance, "SettingData", setting);
-      setFlags(instance);
-      instances.push_back(instance);
     }
   }
-  ZV_PROVIDER_EXIT(loggerDNSGeneralElementSettingData);
-  return 0;
+  markExit(operation);
+  return true;
 }
 
 // Delivers each path at once: a failure further on leaves what went out, and the result open.
 static CMPIStatus DNSGeneralElementSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                                  const CMPIResult* result, const CMPIObjectPath* ref) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralElementSettingData);
-  CMPIStatus status = kStatusOk;
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* systemClass = newPath(broker, nameSpace, computerSystemClass, &status);
-  if (isMissing(systemClass, loggerDNSGeneralElementSettingData, ZV_HERE,
-                "Create CMPIObjectPath failed for computerSystemClass.")) {
-    return status;
-  }
-  const CMPIEnumeration* systems = enumerateInstanceNames(broker, context, systemClass, &status);
-  if (status.rc != CMPI_RC_OK) {
-    logError(loggerDNSGeneralElementSettingData, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-    return status;
+  Operation operation = ZV_OPERATION(context, result, ref);
+  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  const CMPIEnumeration* systems = nullptr;
+  if (!askForNames(operation, nameSpace, computerSystemClass, "Create CMPIObjectPath failed for computerSystemClass.",
+                   systems)) {
+    return operation.status;
   }
   std::vector<CMPIObjectPath*> settings;
-  if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &status) != 0) {
-    logError(loggerDNSGeneralElementSettingData, ZV_HERE, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
-    return status;
+  if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
+    return fail(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
   }
-  while (hasNext(systems, &status)) {
-    const CMPIObjectPath* system = nextPath(systems, &status);
-    const std::string name = keyText(system, "Name", &status);
-    for (unsigned short i = 0; i < count16(settings); ++i) {
-      CMPIObjectPath* setting = settings.at(i);
-      if (keyText(setting, "InstanceID", &status).find(name) == std::string::npos) {
-        logError(loggerDNSGeneralElementSettingData, ZV_HERE, "Key is not matched");
+  while (hasNext(systems, &operation.status)) {
+    const CMPIObjectPath* system = nextPath(systems, &operation.status);
+    const std::string name = keyText(system, "Name", &operation.status);
+    for (CMPIObjectPath* setting : counted16(settings)) {
+      if (keyText(setting, "InstanceID", &operation.status).find(name) == std::string::npos) {
+        complain(operation, "Key is not matched");
         continue;
       }
-      if (isMissing(setting, loggerDNSGeneralElementSettingData, ZV_HERE,  // only after its key was read
-                    "CMPIObjectPath is NULL for DNSGeneralSettingData")) {
-        return status;
-      }
+      // Only after its key was read.
+      if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNSGeneralSettingData")) return operation.status;
       setNameSpace(setting, nameSpace);  // no host, unlike in the builder
-      CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsGeneralElementSettingDataClass, &status);
-      if (isMissing(path, loggerDNSGeneralElementSettingData, ZV_HERE,
+      CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsGeneralElementSettingDataClass, &operation.status);
+      if (isMissing(operation, path,
                     "Create CMPIObjectPath failed for                         DNSGeneralElementSettingData Class")) {
-        return status;
+        return operation.status;
       }
-      addReferenceKey(path, "ManagedElement", system);
-      addReferenceKey(path, "SettingData", setting);
-      returnObjectPath(result, path);
+      returnPairPath(operation, path, "ManagedElement", system, "SettingData", setting);
     }
   }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralElementSettingData);
-  return status;
+  return end(operation);
 }
 
 static CMPIStatus DNSGeneralElementSettingData_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                              const CMPIResult* result, const CMPIObjectPath* ref,
                                                              const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralElementSettingData);
-  std::vector<CMPIInstance*> instances;
-  if (DNSGeneralElementSettingDataCMPIInstances(ref, properties, context, instances) == 0) {
-    returnAll(result, instances);
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralElementSettingData);
-  return kStatusOk;
+  const Operation operation = ZV_OPERATION(context, result, ref);
+  returnBuilt(operation, DNSGeneralElementSettingDataCMPIInstances, properties);
+  return end(operation);
 }
 
 static CMPIStatus DNSGeneralElementSettingData_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
                                                            const CMPIResult* result, const CMPIObjectPath* ref,
                                                            const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralElementSettingData);
-  CMPIStatus status = kStatusOk;
-  std::vector<CMPIInstance*> instances;
-  if (keyCountOf(ref, &status) == 0) {
-    logError(loggerDNSGeneralElementSettingData, ZV_HERE, "At least one key should be passed");
-  } else if (DNSGeneralElementSettingDataCMPIInstances(ref, properties, context, instances) == 0) {
-    returnFirstEqual(result, ref, instances, true, &status);
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralElementSettingData);
-  return status;
+  Operation operation = ZV_OPERATION(context, result, ref);
+  returnEqualBuilt(operation, DNSGeneralElementSettingDataCMPIInstances, properties);
+  return end(operation);
 }
 
 // No key of the source is read in the four operations below: every object of the far end counts.
@@ -160,178 +122,100 @@ static CMPIStatus DNSGeneralElementSettingData_Associators(CMPIAssociationMI*, c
                                                            const CMPIResult* result, const CMPIObjectPath* ref,
                                                            const char* assocClass, const char* resultClass, const char*,
                                                            const char*, const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralElementSettingData);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd = factory.get_assoc_targetClass_ObjectPath(
-      broker, ref, associationOr(assocClass, dnsGeneralElementSettingDataClass), resultClass, &status);
-  if (isMissing(farEnd, loggerDNSGeneralElementSettingData, ZV_HERE, "Object Path is NULL in Associators.")) {
-    return status;
-  }
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == computerSystemClass) {
-    if (!passesResultClass(resultClass, computerSystemClass, "CIM_ComputerSystem")) return status;
-    CMPIObjectPath* systemClass = newPath(broker, nameSpaceOf(ref, &status), computerSystemClass, &status);
-    if (isMissing(systemClass, loggerDNSGeneralElementSettingData, ZV_HERE,
-                  "Create CMPIObjectPath failed for ComputerSystem.")) {
-      return status;
+  const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsGeneralElementSettingDataClass),
+                                      resultClass, "Object Path is NULL in Associators.");
+  if (!isGood(farEnd.path)) return operation.status;
+  if (farEnd.className == computerSystemClass) {
+    if (!passesResultClass(resultClass, computerSystemClass, "CIM_ComputerSystem")) return operation.status;
+    const CMPIEnumeration* systems = nullptr;
+    if (!askForInstances(operation, nameSpaceOf(ref, &operation.status), computerSystemClass,
+                         "Create CMPIObjectPath failed for ComputerSystem.", systems)) {
+      return operation.status;
     }
-    const CMPIEnumeration* systems = enumerateInstances(broker, context, systemClass, &status);
-    if (status.rc != CMPI_RC_OK) {  // the text names the other call
-      logError(loggerDNSGeneralElementSettingData, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(systems, &status)) returnInstance(result, nextInstance(systems, &status));
-  } else if (farEndClass == dnsGeneralSettingDataClass) {
-    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) return status;
+    while (hasNext(systems, &operation.status)) returnInstance(result, nextInstance(systems, &operation.status));
+  } else if (farEnd.className == dnsGeneralSettingDataClass) {
+    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData"))
+      return operation.status;
     std::vector<CMPIInstance*> settings;
-    if (getAllDNSGeneralSettingDataCMPIInstances(broker, ref, properties, &settings, &status) != 0) {
-      logError(loggerDNSGeneralElementSettingData, ZV_HERE, "getAllDNSGeneralSettingDataCMPIInstances Failed");
-      return status;
+    if (getAllDNSGeneralSettingDataCMPIInstances(broker, ref, properties, &settings, &operation.status) != 0) {
+      return fail(operation, "getAllDNSGeneralSettingDataCMPIInstances Failed");
     }
     returnAll(result, settings);
   }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralElementSettingData);
-  return status;
+  return end(operation);
 }
 
 static CMPIStatus DNSGeneralElementSettingData_AssociatorNames(CMPIAssociationMI*, const CMPIContext* context,
                                                                const CMPIResult* result, const CMPIObjectPath* ref,
                                                                const char* assocClass, const char* resultClass,
                                                                const char*, const char*) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralElementSettingData);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd = factory.get_assoc_targetClass_ObjectPath(
-      broker, ref, associationOr(assocClass, dnsGeneralElementSettingDataClass), resultClass, &status);
-  if (isMissing(farEnd, loggerDNSGeneralElementSettingData, ZV_HERE, "Object Path is NULL in Associators.")) {
-    return status;  // the text of the associators
-  }
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == computerSystemClass) {
-    if (!passesResultClass(resultClass, computerSystemClass, "CIM_ComputerSystem")) return status;
-    CMPIObjectPath* systemClass = newPath(broker, nameSpaceOf(ref, &status), computerSystemClass, &status);
-    if (isMissing(systemClass, loggerDNSGeneralElementSettingData, ZV_HERE,
-                  "Create CMPIObjectPath failed for ComputerSystem.")) {
-      return status;
+  const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsGeneralElementSettingDataClass),
+                                      resultClass, "Object Path is NULL in Associators.");
+  if (!isGood(farEnd.path)) return operation.status;
+  if (farEnd.className == computerSystemClass) {
+    if (!passesResultClass(resultClass, computerSystemClass, "CIM_ComputerSystem")) return operation.status;
+    const CMPIEnumeration* systems = nullptr;
+    if (!askForNames(operation, nameSpaceOf(ref, &operation.status), computerSystemClass,
+                     "Create CMPIObjectPath failed for ComputerSystem.", systems)) {
+      return operation.status;
     }
-    const CMPIEnumeration* systems = enumerateInstanceNames(broker, context, systemClass, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSGeneralElementSettingData, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(systems, &status)) returnObjectPath(result, nextPath(systems, &status));
-  } else if (farEndClass == dnsGeneralSettingDataClass) {
-    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) return status;
+    while (hasNext(systems, &operation.status)) returnObjectPath(result, nextPath(systems, &operation.status));
+  } else if (farEnd.className == dnsGeneralSettingDataClass) {
+    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData"))
+      return operation.status;
     std::vector<CMPIObjectPath*> settings;
-    if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &status) != 0) {
-      logError(loggerDNSGeneralElementSettingData, ZV_HERE, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
-      return status;
+    if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
+      return fail(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
     }
     returnAll(result, settings);
   }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralElementSettingData);
-  return status;
+  return end(operation);
+}
+
+static CMPIStatus refer(Operation operation, Deliver deliver) {
+  DNSClientObjFactory factory;
+  const auto [farEnd, nameSpace, association] =
+      resolveReferences(operation, factory, dnsGeneralElementSettingDataClass, newPath,
+                        dnsGeneralElementSettingDataClass, "Object Path is NULL in References.");
+  if (!isGood(farEnd.path)) return operation.status;
+  if (farEnd.className == dnsGeneralSettingDataClass) {
+    std::vector<CMPIObjectPath*> settings;
+    if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, farEnd.path, &settings, &operation.status) != 0) {
+      return fail(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
+    }
+    for (CMPIObjectPath* setting : counted16(settings)) {
+      const CMPIInstance* reference = newInstance(broker, association, &operation.status);
+      setNameSpaceAndHost(setting, nameSpace);
+      setAll(reference, operation.ref, setting);
+      deliver(operation, reference, nameSpace);
+    }
+  } else if (farEnd.className == computerSystemClass) {
+    const CMPIEnumeration* systems = nullptr;
+    if (!askForNames(operation, farEnd.path, systems)) return operation.status;
+    while (hasNext(systems, &operation.status)) {
+      nextPath(systems, &operation.status);  // only counted: each reference names the far end's class without keys
+      const CMPIInstance* reference = newInstance(broker, association, &operation.status);
+      setAll(reference, farEnd.path, operation.ref);
+      deliver(operation, reference, nameSpace);
+    }
+  }
+  return end(operation);
 }
 
 static CMPIStatus DNSGeneralElementSettingData_References(CMPIAssociationMI*, const CMPIContext* context,
                                                           const CMPIResult* result, const CMPIObjectPath* ref,
                                                           const char*, const char*, const char**) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralElementSettingData);
-  CMPIStatus status = kStatusOk;
-  DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd =
-      factory.get_assoc_targetClass_ObjectPath(broker, ref, dnsGeneralElementSettingDataClass, nullptr, &status);
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* association = newPath(broker, nameSpace, dnsGeneralElementSettingDataClass, &status);  // no host
-  if (isMissing(farEnd, loggerDNSGeneralElementSettingData, ZV_HERE, "Object Path is NULL in References.")) {
-    return status;
-  }
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == dnsGeneralSettingDataClass) {
-    std::vector<CMPIObjectPath*> settings;
-    if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, farEnd, &settings, &status) != 0) {
-      logError(loggerDNSGeneralElementSettingData, ZV_HERE, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
-      return status;
-    }
-    for (unsigned short i = 0; i < count16(settings); ++i) {
-      CMPIObjectPath* setting = settings.at(i);
-      CMPIInstance* reference = newInstance(broker, association, &status);
-      setNameSpaceAndHost(setting, nameSpace);
-      setReference(reference, "ManagedElement", ref);
-      setReference(reference, "SettingData", setting);
-      setFlags(reference);
-      returnInstance(result, reference);
-    }
-  } else if (farEndClass == computerSystemClass) {
-    const CMPIEnumeration* systems = enumerateInstanceNames(broker, context, farEnd, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSGeneralElementSettingData, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(systems, &status)) {
-      nextPath(systems, &status);  // only counted: each reference names the far end's class without keys
-      CMPIInstance* reference = newPair(broker, association, "ManagedElement", farEnd, "SettingData", ref, &status);
-      setFlags(reference);
-      returnInstance(result, reference);
-    }
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralElementSettingData);
-  return status;
+  return refer(ZV_OPERATION(context, result, ref), deliverInstance);
 }
 
 static CMPIStatus DNSGeneralElementSettingData_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
                                                               const CMPIResult* result, const CMPIObjectPath* ref,
                                                               const char*, const char*) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralElementSettingData);
-  CMPIStatus status = kStatusOk;
-  DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd =
-      factory.get_assoc_targetClass_ObjectPath(broker, ref, dnsGeneralElementSettingDataClass, nullptr, &status);
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* association = newPath(broker, nameSpace, dnsGeneralElementSettingDataClass, &status);
-  if (isMissing(farEnd, loggerDNSGeneralElementSettingData, ZV_HERE, "Object Path is NULL in References.")) {
-    return status;  // the text of the references
-  }
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  if (farEndClass == dnsGeneralSettingDataClass) {
-    std::vector<CMPIObjectPath*> settings;
-    if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, farEnd, &settings, &status) != 0) {
-      logError(loggerDNSGeneralElementSettingData, ZV_HERE, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
-      return status;
-    }
-    for (unsigned short i = 0; i < count16(settings); ++i) {
-      CMPIObjectPath* setting = settings.at(i);
-      CMPIInstance* reference = newInstance(broker, association, &status);
-      setNameSpaceAndHost(setting, nameSpace);
-      setReference(reference, "ManagedElement", ref);
-      setReference(reference, "SettingData", setting);
-      setFlags(reference);
-      CMPIObjectPath* path = objectPathOf(reference, &status);
-      setNameSpace(path, nameSpace);
-      returnObjectPath(result, path);
-    }
-  } else if (farEndClass == computerSystemClass) {
-    const CMPIEnumeration* systems = enumerateInstanceNames(broker, context, farEnd, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSGeneralElementSettingData, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(systems, &status)) {
-      nextPath(systems, &status);  // as in the references
-      CMPIInstance* reference = newPair(broker, association, "ManagedElement", farEnd, "SettingData", ref, &status);
-      setFlags(reference);
-      CMPIObjectPath* path = objectPathOf(reference, &status);
-      setNameSpace(path, nameSpace);
-      returnObjectPath(result, path);
-    }
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralElementSettingData);
-  return status;
+  return refer(ZV_OPERATION(context, result, ref), deliverPath);
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSGeneralElementSettingData)

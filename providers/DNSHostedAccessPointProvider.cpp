@@ -23,10 +23,11 @@ static bool DNSHostedAccessPointCMPIInstances(const CMPIContext* context, const 
   Operation operation = ZV_OPERATION(context, nullptr, ref);
   DNSClientObjFactory factory;
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
-  CMPIObjectPath* systemClass = newPath(broker, nameSpace, computerSystemClass, &operation.status);
-  if (isMissing(operation, systemClass, "Create CMPIObjectPath failed for ComputerSystem.")) return false;
   const CMPIEnumeration* systems = nullptr;
-  if (!askForNames(operation, systemClass, systems)) return false;
+  if (!askForNames(operation, nameSpace, computerSystemClass, "Create CMPIObjectPath failed for ComputerSystem.",
+                   systems)) {
+    return false;
+  }
   while (hasNext(systems, &operation.status)) {
     const CMPIObjectPath* system = nextPath(systems, &operation.status);
     const std::string name = keyText(system, "Name", &operation.status);
@@ -60,10 +61,11 @@ static CMPIStatus DNSHostedAccessPoint_EnumInstanceNames(CMPIInstanceMI*, const 
   Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
-  CMPIObjectPath* systemClass = newPath(broker, nameSpace, computerSystemClass, &operation.status);
-  if (isMissing(operation, systemClass, "Create CMPIObjectPath failed for ComputerSystem.")) return operation.status;
   const CMPIEnumeration* systems = nullptr;
-  if (!askForNames(operation, systemClass, systems)) return operation.status;
+  if (!askForNames(operation, nameSpace, computerSystemClass, "Create CMPIObjectPath failed for ComputerSystem.",
+                   systems)) {
+    return operation.status;
+  }
   while (hasNext(systems, &operation.status)) {
     const CMPIObjectPath* system = nextPath(systems, &operation.status);
     const std::string name = keyText(system, "Name", &operation.status);

@@ -5,342 +5,237 @@
 // DNS setting's. Without a "%" the builder takes it whole; the association operations stop at it.
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSSettingDataObjects.h"
-#include "providers/AssociationSteps.h"
+#include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"
 #include "providers/Results.h"
 
 namespace ZV {
 
-static const std::string loggerDNSOrderedComponent = "Zorvagent.DNSOrderedComponentProvider";
+static const std::string logCategory = "Zorvagent.DNSOrderedComponentProvider";
 static const char* const dnsSettingDataClass = "ZORVA_DNSSettingData";
 static const char* const dnsOrderedComponentClass = "ZORVA_DNSOrderedComponent";
 static const char* const ipAssignmentSettingDataClass = "ZORVA_IPAssignmentSettingData";
 
-static constexpr CMPIUint64 kAssignedSequence = 2;  // the host-wide settings come first
-
 namespace {
 
+// Both references and the place: the host-wide settings come first.
+void setAll(const CMPIInstance* instance, const CMPIObjectPath* group, const CMPIObjectPath* part) {
+  setPair(instance, "GroupComponent", group, "PartComponent", part);
+  setUint64(instance, "AssignedSequence", 2);
+}
+
+std::string pathKey(Operation& operation, const CMPIInstance* instance) {
+  return keyText(objectPathOf(instance, &operation.status), "InstanceID", &operation.status);
+}
+
 // The DNS setting's InstanceID in that of an IP assignment; false where the operation cannot go on without a "%".
-bool requireTarget(const std::string& instanceID, std::string& target, const LogSite& site) {
+bool requireTarget(const Operation& operation, const std::string& instanceID, std::string& target,
+                   const Place& place = Place::here()) {
   const std::size_t cut = instanceID.rfind('%');
-  if (cut == std::string::npos) {
-    logError(loggerDNSOrderedComponent, site, "Invalid InstanceId");
-    return false;
-  }
+  if (cut == std::string::npos) return complain(operation, "Invalid InstanceId", place);
   target = instanceID.substr(0, cut);
   return true;
 }
 
 }  // namespace
 
-static unsigned short DNSOrderedComponentCMPIInstances(const CMPIObjectPath* ref, const char** properties,
-                                                       const CMPIContext* context,
-                                                       std::vector<CMPIInstance*>& instances) {
-  logEntry(loggerDNSOrderedComponent, ZV_HERE, " ref=", ref, " properties=", properties, " ctx=", context,
-           " instances=", &instances);
-  CMPIStatus status = kStatusOk;
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* assignmentClass = newPath(broker, nameSpace, ipAssignmentSettingDataClass, &status);
-  if (isMissing(assignmentClass, loggerDNSOrderedComponent, ZV_HERE,
-                "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.")) {
-    return 1;
-  }
-  const CMPIEnumeration* assignments = enumerateInstanceNames(broker, context, assignmentClass, &status);
-  if (status.rc != CMPI_RC_OK) {
-    logError(loggerDNSOrderedComponent, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-    return 1;
+static bool DNSOrderedComponentCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
+                                             const char** properties, std::vector<CMPIInstance*>& instances) {
+  Operation operation = ZV_UNMARKED_OPERATION(context, nullptr, ref);
+  const FlowLog flow(logCategory, ZV_HERE, " ref=", ref, " properties=", properties, " ctx=", context,
+                     " instances=", &instances);
+  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  const CMPIEnumeration* assignments = nullptr;
+  if (!askForNames(operation, nameSpace, ipAssignmentSettingDataClass,
+                   "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.", assignments)) {
+    return false;
   }
   std::vector<CMPIObjectPath*> settings;
-  if (getAllDNSSettingDataCMPIObjectPaths(broker, ref, &settings, &status) != 0) {
-    logError(loggerDNSOrderedComponent, ZV_HERE, "getAllDNSSettingDataCMPIObjectPaths failed");
-    ZV_PROVIDER_EXIT(loggerDNSOrderedComponent);
-    return 1;
+  if (getAllDNSSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
+    complain(operation, "getAllDNSSettingDataCMPIObjectPaths failed");
+    markExit(operation);
+    return false;
   }
-  while (hasNext(assignments, &status)) {
-    const CMPIObjectPath* assignment = nextPath(assignments, &status);
-    const std::string instanceID = keyText(assignment, "InstanceID", &status);
+  while (hasNext(assignments, &operation.status)) {
+    const CMPIObjectPath* assignment = nextPath(assignments, &operation.status);
+    const std::string instanceID = keyText(assignment, "InstanceID", &operation.status);
     const std::string target = instanceID.substr(0, instanceID.rfind('%'));  // without a "%" the whole text
-    logVariable(loggerDNSOrderedComponent, ZV_HERE, "target", target);
-    for (unsigned short i = 0; i < count16(settings); ++i) {
-      CMPIObjectPath* setting = settings.at(i);
-      if (isMissing(setting, loggerDNSOrderedComponent, ZV_HERE, "CMPIObjectPath is NULL for DNS Client")) {
-        return 1;  // the text says Client, though the path is of setting data
-      }
-      if (keyText(setting, "InstanceID", &status) != target) continue;
+    logValue(operation, "target", target);
+    for (CMPIObjectPath* setting : counted16(settings)) {
+      if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return false;
+      if (keyText(setting, "InstanceID", &operation.status) != target) continue;
       setNameSpaceAndHost(setting, nameSpace);
-      CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsOrderedComponentClass, &status);
-      if (isMissing(path, loggerDNSOrderedComponent, ZV_HERE,
-                    "Create CMPIObjectPath failed for                         DNSOrderedComponent.")) {
-        return 1;
+      CMPIInstance* instance = nullptr;
+      if (!newBuilt(operation, nameSpace, dnsOrderedComponentClass,
+                    "Create CMPIObjectPath failed for                         DNSOrderedComponent.", instance)) {
+        return false;
       }
-      CMPIInstance* instance = newInstance(broker, path, nullptr);
       if (!isGood(instance)) continue;
       setPropertyFilter(instance, properties, {"GroupComponent", "PartComponent"});
-      setReference(instance, "GroupComponent", assignment);
-      setReference(instance, "PartComponent", setting);
-      setUint64(instance, "AssignedSequence", kAssignedSequence);
+      setAll(instance, assignment, setting);
       instances.push_back(instance);
     }
   }
-  logExit(loggerDNSOrderedComponent, ZV_HERE, " ref=", ref, " properties=", properties, " ctx=", context,
-          " instances=", &instances);
-  return 0;
+  flow.exit();
+  return true;
 }
 
-// Unlike most siblings by way of the builder: nothing goes out before all is built.
+// The paths of what is built: nothing goes out before all is built.
 static CMPIStatus DNSOrderedComponent_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                         const CMPIResult* result, const CMPIObjectPath* ref) {
-  ZV_PROVIDER_ENTRY(loggerDNSOrderedComponent);
-  CMPIStatus status = kStatusOk;
-  std::vector<CMPIInstance*> instances;
-  if (DNSOrderedComponentCMPIInstances(ref, nullptr, context, instances) == 0) {
-    returnPathsOf(result, instances, &status);
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSOrderedComponent);
-  return status;
+  Operation operation = ZV_OPERATION(context, result, ref);
+  returnPathsOfBuilt(operation, DNSOrderedComponentCMPIInstances);
+  return end(operation);
 }
 
 static CMPIStatus DNSOrderedComponent_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                     const CMPIResult* result, const CMPIObjectPath* ref,
                                                     const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSOrderedComponent);
-  std::vector<CMPIInstance*> instances;
-  if (DNSOrderedComponentCMPIInstances(ref, properties, context, instances) == 0) returnAll(result, instances);
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSOrderedComponent);
-  return kStatusOk;
+  const Operation operation = ZV_OPERATION(context, result, ref);
+  returnBuilt(operation, DNSOrderedComponentCMPIInstances, properties);
+  return end(operation);
 }
 
 static CMPIStatus DNSOrderedComponent_GetInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                                   const CMPIObjectPath* ref, const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSOrderedComponent);
-  CMPIStatus status = kStatusOk;
-  std::vector<CMPIInstance*> instances;
-  if (keyCountOf(ref, &status) == 0) {
-    logError(loggerDNSOrderedComponent, ZV_HERE, "At least one key should be passed");
-  } else if (DNSOrderedComponentCMPIInstances(ref, properties, context, instances) == 0) {
-    returnFirstEqual(result, ref, instances, true, &status);
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSOrderedComponent);
-  return status;
+  Operation operation = ZV_OPERATION(context, result, ref);
+  returnEqualBuilt(operation, DNSOrderedComponentCMPIInstances, properties);
+  return end(operation);
 }
 
 static CMPIStatus DNSOrderedComponent_Associators(CMPIAssociationMI*, const CMPIContext* context,
                                                   const CMPIResult* result, const CMPIObjectPath* ref,
                                                   const char* assocClass, const char* resultClass, const char*,
                                                   const char*, const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSOrderedComponent);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd = factory.get_assoc_targetClass_ObjectPath(
-      broker, ref, associationOr(assocClass, dnsOrderedComponentClass), resultClass, &status);
-  if (isMissing(farEnd, loggerDNSOrderedComponent, ZV_HERE, "Object Path is NULL in Associators.")) return status;
-
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  const std::string sourceID = keyText(ref, "InstanceID", &status);
+  const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsOrderedComponentClass),
+                                      resultClass, "Object Path is NULL in Associators.");
+  if (!isGood(farEnd.path)) return operation.status;
+  const std::string sourceID = sourceKey(operation, "InstanceID");
   std::string target;
-  if (farEndClass == ipAssignmentSettingDataClass) {
-    if (!passesResultClass(resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData")) return status;
-    CMPIObjectPath* assignmentClass = newPath(broker, nameSpaceOf(ref, &status), ipAssignmentSettingDataClass, &status);
-    if (isMissing(assignmentClass, loggerDNSOrderedComponent, ZV_HERE,
-                  "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.")) {
-      return status;
+  if (farEnd.className == ipAssignmentSettingDataClass) {
+    if (!passesResultClass(resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData"))
+      return operation.status;
+    const CMPIEnumeration* assignments = nullptr;
+    if (!askForInstances(operation, nameSpaceOf(ref, &operation.status), ipAssignmentSettingDataClass,
+                         "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.", assignments)) {
+      return operation.status;
     }
-    const CMPIEnumeration* assignments = enumerateInstances(broker, context, assignmentClass, &status);
-    if (status.rc != CMPI_RC_OK) {  // the text names the other call
-      logError(loggerDNSOrderedComponent, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(assignments, &status)) {
-      const CMPIInstance* assignment = nextInstance(assignments, &status);
-      const std::string instanceID = keyText(objectPathOf(assignment, &status), "InstanceID", &status);
-      if (!requireTarget(instanceID, target, ZV_HERE)) return status;
+    while (hasNext(assignments, &operation.status)) {
+      const CMPIInstance* assignment = nextInstance(assignments, &operation.status);
+      if (!requireTarget(operation, pathKey(operation, assignment), target)) return operation.status;
       if (target == sourceID) returnInstance(result, assignment);
     }
-  } else if (farEndClass == dnsSettingDataClass) {
-    if (!passesResultClass(resultClass, dnsSettingDataClass, "CIM_DNSSettingData")) return status;
+  } else if (farEnd.className == dnsSettingDataClass) {
+    if (!passesResultClass(resultClass, dnsSettingDataClass, "CIM_DNSSettingData")) return operation.status;
     std::vector<CMPIInstance*> settings;
-    if (getAllDNSSettingDataCMPIInstances(broker, ref, properties, &settings, &status) != 0) {
-      logError(loggerDNSOrderedComponent, ZV_HERE, "getAllDNSSettingDataCMPIInstances Failed");
-      return status;
+    if (getAllDNSSettingDataCMPIInstances(broker, ref, properties, &settings, &operation.status) != 0) {
+      return fail(operation, "getAllDNSSettingDataCMPIInstances Failed");
     }
-    for (unsigned short i = 0; i < count16(settings); ++i) {
-      const CMPIInstance* setting = settings.at(i);
-      const std::string instanceID = keyText(objectPathOf(setting, &status), "InstanceID", &status);
-      if (!requireTarget(sourceID, target, ZV_HERE)) return status;  // tested only once there is a candidate
+    for (const CMPIInstance* setting : counted16(settings)) {
+      const std::string instanceID = pathKey(operation, setting);
+      if (!requireTarget(operation, sourceID, target)) return operation.status;  // only once there is a candidate
       if (target == instanceID) returnInstance(result, setting);
     }
   }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSOrderedComponent);
-  return status;
+  return end(operation);
 }
 
 static CMPIStatus DNSOrderedComponent_AssociatorNames(CMPIAssociationMI*, const CMPIContext* context,
                                                       const CMPIResult* result, const CMPIObjectPath* ref,
                                                       const char* assocClass, const char* resultClass, const char*,
                                                       const char*) {
-  ZV_PROVIDER_ENTRY(loggerDNSOrderedComponent);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd = factory.get_assoc_targetClass_ObjectPath(
-      broker, ref, associationOr(assocClass, dnsOrderedComponentClass), resultClass, &status);
-  if (isMissing(farEnd, loggerDNSOrderedComponent, ZV_HERE, "Object Path is NULL in Associators.")) {
-    return status;  // the text of the associators
-  }
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  const std::string sourceID = keyText(ref, "InstanceID", &status);
+  const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsOrderedComponentClass),
+                                      resultClass, "Object Path is NULL in Associators.");
+  if (!isGood(farEnd.path)) return operation.status;
+  const std::string sourceID = sourceKey(operation, "InstanceID");
   std::string target;
-  if (farEndClass == ipAssignmentSettingDataClass) {
-    if (!passesResultClass(resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData")) return status;
-    CMPIObjectPath* assignmentClass = newPath(broker, nameSpaceOf(ref, &status), ipAssignmentSettingDataClass, &status);
-    if (isMissing(assignmentClass, loggerDNSOrderedComponent, ZV_HERE,  // a class that is not touched here
-                  "Create CMPIObjectPath failed for ComputerSystem.")) {
-      return status;
+  if (farEnd.className == ipAssignmentSettingDataClass) {
+    if (!passesResultClass(resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData"))
+      return operation.status;
+    const CMPIEnumeration* assignments = nullptr;
+    if (!askForNames(operation, nameSpaceOf(ref, &operation.status), ipAssignmentSettingDataClass,
+                     "Create CMPIObjectPath failed for ComputerSystem.", assignments)) {
+      return operation.status;
     }
-    const CMPIEnumeration* assignments = enumerateInstanceNames(broker, context, assignmentClass, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSOrderedComponent, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(assignments, &status)) {
-      const CMPIObjectPath* assignment = nextPath(assignments, &status);
-      if (!requireTarget(keyText(assignment, "InstanceID", &status), target, ZV_HERE)) return status;
+    while (hasNext(assignments, &operation.status)) {
+      const CMPIObjectPath* assignment = nextPath(assignments, &operation.status);
+      const std::string instanceID = keyText(assignment, "InstanceID", &operation.status);
+      if (!requireTarget(operation, instanceID, target)) return operation.status;
       if (target == sourceID) returnObjectPath(result, assignment);
     }
-  } else if (farEndClass == dnsSettingDataClass) {
-    if (!passesResultClass(resultClass, dnsSettingDataClass, "CIM_DNSSettingData")) return status;
+  } else if (farEnd.className == dnsSettingDataClass) {
+    if (!passesResultClass(resultClass, dnsSettingDataClass, "CIM_DNSSettingData")) return operation.status;
     std::vector<CMPIObjectPath*> settings;
-    if (getAllDNSSettingDataCMPIObjectPaths(broker, ref, &settings, &status) != 0) {
-      logError(loggerDNSOrderedComponent, ZV_HERE, "getAllDNSSettingDataCMPIObjectPaths Failed");
-      return status;
+    if (getAllDNSSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
+      return fail(operation, "getAllDNSSettingDataCMPIObjectPaths Failed");
     }
-    for (unsigned short i = 0; i < count16(settings); ++i) {
-      const CMPIObjectPath* setting = settings.at(i);
-      const std::string instanceID = keyText(setting, "InstanceID", &status);
-      if (!requireTarget(sourceID, target, ZV_HERE)) return status;
+    for (const CMPIObjectPath* setting : counted16(settings)) {
+      const std::string instanceID = keyText(setting, "InstanceID", &operation.status);
+      if (!requireTarget(operation, sourceID, target)) return operation.status;
       if (target == instanceID) returnObjectPath(result, setting);
     }
   }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSOrderedComponent);
-  return status;
+  return end(operation);
+}
+
+// The part of a reference to an IP assignment: the far end's class without keys in the references, the source in their
+// names.
+using PartOf = const CMPIObjectPath* (*)(const Operation& operation, const FarEnd& farEnd);
+static const CMPIObjectPath* farEndOf(const Operation&, const FarEnd& farEnd) { return farEnd.path; }
+static const CMPIObjectPath* sourceOf(const Operation& operation, const FarEnd&) { return operation.ref; }
+
+static CMPIStatus refer(Operation operation, PartOf partOf, Deliver deliver) {
+  DNSClientObjFactory factory;
+  const auto [farEnd, nameSpace, association] =
+      resolveReferences(operation, factory, dnsOrderedComponentClass, newPath, dnsOrderedComponentClass,
+                        "Object Path is NULL in References.");
+  if (!isGood(farEnd.path)) return operation.status;
+  const std::string sourceID = sourceKey(operation, "InstanceID");
+  std::string target;
+  if (farEnd.className == dnsSettingDataClass) {
+    std::vector<CMPIObjectPath*> settings;
+    if (getAllDNSSettingDataCMPIObjectPaths(broker, farEnd.path, &settings, &operation.status) != 0) {
+      return fail(operation, "getAllDNSSettingDataCMPIObjectPaths Failed");
+    }
+    for (CMPIObjectPath* setting : counted16(settings)) {
+      const CMPIInstance* reference = newInstance(broker, association, &operation.status);  // matched or not
+      const std::string instanceID = keyText(setting, "InstanceID", &operation.status);
+      if (!requireTarget(operation, sourceID, target)) return operation.status;
+      if (target != instanceID) continue;
+      setNameSpaceAndHost(setting, nameSpace);
+      setAll(reference, operation.ref, setting);
+      deliver(operation, reference, nameSpace);
+    }
+  } else if (farEnd.className == ipAssignmentSettingDataClass) {
+    const CMPIEnumeration* assignments = nullptr;
+    if (!askForNames(operation, farEnd.path, assignments)) return operation.status;
+    while (hasNext(assignments, &operation.status)) {
+      const CMPIObjectPath* assignment = nextPath(assignments, &operation.status);
+      const std::string instanceID = keyText(assignment, "InstanceID", &operation.status);
+      if (!requireTarget(operation, instanceID, target)) return operation.status;
+      if (target != sourceID) continue;
+      const CMPIInstance* reference = newInstance(broker, association, &operation.status);
+      setAll(reference, assignment, partOf(operation, farEnd));
+      deliver(operation, reference, nameSpace);
+    }
+  }
+  return end(operation);
 }
 
 static CMPIStatus DNSOrderedComponent_References(CMPIAssociationMI*, const CMPIContext* context,
                                                  const CMPIResult* result, const CMPIObjectPath* ref, const char*,
                                                  const char*, const char**) {
-  ZV_PROVIDER_ENTRY(loggerDNSOrderedComponent);
-  CMPIStatus status = kStatusOk;
-  DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd =
-      factory.get_assoc_targetClass_ObjectPath(broker, ref, dnsOrderedComponentClass, nullptr, &status);
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* association = newPath(broker, nameSpace, dnsOrderedComponentClass, &status);  // no host
-  if (isMissing(farEnd, loggerDNSOrderedComponent, ZV_HERE, "Object Path is NULL in References.")) return status;
-
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  const std::string sourceID = keyText(ref, "InstanceID", &status);
-  std::string target;
-  if (farEndClass == dnsSettingDataClass) {
-    std::vector<CMPIObjectPath*> settings;
-    if (getAllDNSSettingDataCMPIObjectPaths(broker, farEnd, &settings, &status) != 0) {
-      logError(loggerDNSOrderedComponent, ZV_HERE, "getAllDNSSettingDataCMPIObjectPaths Failed");
-      return status;
-    }
-    for (unsigned short i = 0; i < count16(settings); ++i) {
-      CMPIObjectPath* setting = settings.at(i);
-      CMPIInstance* reference = newInstance(broker, association, &status);  // for every candidate, matched or not
-      const std::string instanceID = keyText(setting, "InstanceID", &status);
-      if (!requireTarget(sourceID, target, ZV_HERE)) return status;
-      if (target != instanceID) continue;
-      setNameSpaceAndHost(setting, nameSpace);
-      setReference(reference, "GroupComponent", ref);
-      setReference(reference, "PartComponent", setting);
-      setUint64(reference, "AssignedSequence", kAssignedSequence);
-      returnInstance(result, reference);
-    }
-  } else if (farEndClass == ipAssignmentSettingDataClass) {
-    const CMPIEnumeration* assignments = enumerateInstanceNames(broker, context, farEnd, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSOrderedComponent, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(assignments, &status)) {
-      const CMPIObjectPath* assignment = nextPath(assignments, &status);
-      if (!requireTarget(keyText(assignment, "InstanceID", &status), target, ZV_HERE)) return status;
-      if (target != sourceID) continue;
-      // The part is the far end's class without keys, not the source; the reference names have the source.
-      CMPIInstance* reference =
-          newPair(broker, association, "GroupComponent", assignment, "PartComponent", farEnd, &status);
-      setUint64(reference, "AssignedSequence", kAssignedSequence);
-      returnInstance(result, reference);
-    }
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSOrderedComponent);
-  return status;
+  return refer(ZV_OPERATION(context, result, ref), farEndOf, deliverInstance);
 }
 
 static CMPIStatus DNSOrderedComponent_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
                                                      const CMPIResult* result, const CMPIObjectPath* ref, const char*,
                                                      const char*) {
-  ZV_PROVIDER_ENTRY(loggerDNSOrderedComponent);
-  CMPIStatus status = kStatusOk;
-  DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd =
-      factory.get_assoc_targetClass_ObjectPath(broker, ref, dnsOrderedComponentClass, nullptr, &status);
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* association = newPath(broker, nameSpace, dnsOrderedComponentClass, &status);
-  if (isMissing(farEnd, loggerDNSOrderedComponent, ZV_HERE, "Object Path is NULL in References.")) {
-    return status;  // the text of the references
-  }
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  const std::string sourceID = keyText(ref, "InstanceID", &status);
-  std::string target;
-  if (farEndClass == dnsSettingDataClass) {
-    std::vector<CMPIObjectPath*> settings;
-    if (getAllDNSSettingDataCMPIObjectPaths(broker, farEnd, &settings, &status) != 0) {
-      logError(loggerDNSOrderedComponent, ZV_HERE, "getAllDNSSettingDataCMPIObjectPaths Failed");
-      return status;
-    }
-    for (unsigned short i = 0; i < count16(settings); ++i) {
-      CMPIObjectPath* setting = settings.at(i);
-      CMPIInstance* reference = newInstance(broker, association, &status);  // for every candidate, matched or not
-      const std::string instanceID = keyText(setting, "InstanceID", &status);
-      if (!requireTarget(sourceID, target, ZV_HERE)) return status;
-      if (target != instanceID) continue;
-      setNameSpaceAndHost(setting, nameSpace);
-      setReference(reference, "GroupComponent", ref);
-      setReference(reference, "PartComponent", setting);
-      setUint64(reference, "AssignedSequence", kAssignedSequence);
-      CMPIObjectPath* path = objectPathOf(reference, &status);
-      setNameSpace(path, nameSpace);
-      returnObjectPath(result, path);
-    }
-  } else if (farEndClass == ipAssignmentSettingDataClass) {
-    const CMPIEnumeration* assignments = enumerateInstanceNames(broker, context, farEnd, &status);
-    if (status.rc != CMPI_RC_OK) {
-      logError(loggerDNSOrderedComponent, ZV_HERE, "CBEnumInstanceNames Failed for the target Class");
-      return status;
-    }
-    while (hasNext(assignments, &status)) {
-      const CMPIObjectPath* assignment = nextPath(assignments, &status);
-      if (!requireTarget(keyText(assignment, "InstanceID", &status), target, ZV_HERE)) return status;
-      if (target != sourceID) continue;
-      CMPIInstance* reference =
-          newPair(broker, association, "GroupComponent", assignment, "PartComponent", ref, &status);
-      setUint64(reference, "AssignedSequence", kAssignedSequence);
-      CMPIObjectPath* path = objectPathOf(reference, &status);
-      setNameSpace(path, nameSpace);
-      returnObjectPath(result, path);
-    }
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSOrderedComponent);
-  return status;
+  return refer(ZV_OPERATION(context, result, ref), sourceOf, deliverPath);
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSOrderedComponent)

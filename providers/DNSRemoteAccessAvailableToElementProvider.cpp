@@ -1,292 +1,232 @@
 // ZORVA_RemoteAccessAvailableToElement: every DNS server is within reach of every endpoint. Instance and association
 // provider, wholly from the factory.
 #include "factory/DNSClientObjFactory.h"
-#include "providers/AssociationSteps.h"
+#include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"
 #include "providers/Results.h"
 
 namespace ZV {
 
-static const std::string loggerDNSRemoteAccess = "Zorvagent.DNSRemoteAccessAvailableToElementProvider";
+static const std::string logCategory = "Zorvagent.DNSRemoteAccessAvailableToElementProvider";
 static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
 static const char* const remoteServiceAccessPointClass = "ZORVA_RemoteServiceAccessPoint";
 static const char* const remoteAccessAvailableToElementClass = "ZORVA_RemoteAccessAvailableToElement";
 
-static unsigned short RemoteAccessAvailableToElementCMPIInstances(const CMPIObjectPath* ref, const char** properties,
-                                                                  std::vector<CMPIInstance*>& instances) {
-  logEntry(loggerDNSRemoteAccess, ZV_HERE, " ref=", ref, " properties=", properties, " instances=", &instances);
-  CMPIStatus status = kStatusOk;
+static bool RemoteAccessAvailableToElementCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
+                                                        const char** properties,
+                                                        std::vector<CMPIInstance*>& instances) {
+  Operation operation = ZV_UNMARKED_OPERATION(context, nullptr, ref);
+  const FlowLog flow(logCategory, ZV_HERE, " ref=", ref, " properties=", properties, " instances=", &instances);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> servers;
-  servers.reserve(factory.getNumberOfDNSServerInstances());
-  if (factory.getAllDNSServerCMPIObjPaths(broker, ref, servers, &status) != 0) {
-    logError(loggerDNSRemoteAccess, ZV_HERE,
-             "***Can't get DNS Server ObjectPaths.             Exiting EnumerateInstanceNames***");
-    return 1;
+  if (!fetchServers(operation, factory, ref, servers)) {
+    return complain(operation, "***Can't get DNS Server ObjectPaths.             Exiting EnumerateInstanceNames***");
   }
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  for (unsigned short s = 0; s < count16(servers); ++s) {
-    CMPIObjectPath* server = servers.at(s);
-    if (isMissing(server, loggerDNSRemoteAccess, ZV_HERE, "CMPIObjectPath is NULL for DNS Server")) return 1;
+  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  for (CMPIObjectPath* server : counted16(servers)) {
+    if (isMissing(operation, server, "CMPIObjectPath is NULL for DNS Server")) return false;
     std::vector<CMPIObjectPath*> clients;  // made afresh for every server
-    clients.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIObjPaths(broker, ref, clients, &status) != 0) {
-      logError(loggerDNSRemoteAccess, ZV_HERE,
-               "***Can't get ObjectPaths for DNSClient.                 Exiting EnumerateInstanceNames***");
-      return 1;
+    if (!fetchEndpoints(operation, factory, ref, clients)) {
+      return complain(operation,
+                      "***Can't get ObjectPaths for DNSClient.                 Exiting EnumerateInstanceNames***");
     }
-    for (unsigned short c = 0; c < count16(clients); ++c) {
-      CMPIObjectPath* client = clients.at(c);
-      if (isMissing(client, loggerDNSRemoteAccess, ZV_HERE, "CMPIObjectPath is NULL for DNSClient")) return 1;
+    for (const CMPIObjectPath* client : counted16(clients)) {
+      if (isMissing(operation, client, "CMPIObjectPath is NULL for DNSClient")) return false;
       CMPIObjectPath* path = newHostPath(broker, nameSpace, remoteAccessAvailableToElementClass, nullptr);
-      if (isMissing(path, loggerDNSRemoteAccess, ZV_HERE,
-                    "Create CMPIObjectPath failed for RemoteAccessAvailableToElement.")) {
-        return 1;
-      }
+      if (isMissing(operation, path, "Create CMPIObjectPath failed for RemoteAccessAvailableToElement.")) return false;
       CMPIInstance* instance = newInstance(broker, path, nullptr);
-      if (isGood(instance)) {
-        setPropertyFilter(instance, properties, {"Antecedent", "Dependent"});
-        setReference(instance, "Antecedent", server);
-        setReference(instance, "Dependent", client);
-        setUint16(instance, "OrderOfAccess", factory.getOrderOfAccess(broker, server, &status));
-      }
       instances.push_back(instance);  // good or not
+      if (!isGood(instance)) continue;
+      setPropertyFilter(instance, properties, {"Antecedent", "Dependent"});
+      setPair(instance, "Antecedent", server, "Dependent", client);
+      setUint16(instance, "OrderOfAccess", factory.getOrderOfAccess(broker, server, &operation.status));
     }
   }
-  logExit(loggerDNSRemoteAccess, ZV_HERE, " ref=", ref, " properties=", properties, " instances=", &instances);
-  return 0;
+  flow.exit();
+  return true;
+}
+
+// The enumerations alone are done after they are marked as left.
+static CMPIStatus endEnumeration(const Operation& operation, const Place& place = Place::here()) {
+  markExit(operation, place);
+  returnDone(operation.result);
+  return operation.status;
 }
 
 // Delivers each path at once: a failure further on leaves what went out, and the result open.
-static CMPIStatus DNSRemoteAccessAvailableToElement_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext*,
+static CMPIStatus DNSRemoteAccessAvailableToElement_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                                       const CMPIResult* result,
                                                                       const CMPIObjectPath* ref) {
-  ZV_PROVIDER_ENTRY(loggerDNSRemoteAccess);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> servers;
-  servers.reserve(factory.getNumberOfDNSServerInstances());
-  if (factory.getAllDNSServerCMPIObjPaths(broker, ref, servers, &status) != 0) {
-    logError(loggerDNSRemoteAccess, ZV_HERE,  // with the possessive that the builder's text lacks
-             "***Can't get DNS Server's ObjectPaths.             Exiting EnumerateInstanceNames***");
-    return status;
+  if (!fetchServers(operation, factory, ref, servers)) {
+    return fail(operation, "***Can't get DNS Server's ObjectPaths.             Exiting EnumerateInstanceNames***");
   }
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  for (unsigned short s = 0; s < count16(servers); ++s) {
-    CMPIObjectPath* server = servers.at(s);
-    if (isMissing(server, loggerDNSRemoteAccess, ZV_HERE, "CMPIObjectPath is NULL for DNS Server")) return status;
+  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  for (CMPIObjectPath* server : counted16(servers)) {
+    if (isMissing(operation, server, "CMPIObjectPath is NULL for DNS Server")) return operation.status;
     setNameSpace(server, nameSpace);
     std::vector<CMPIObjectPath*> clients;
-    clients.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIObjPaths(broker, ref, clients, &status) != 0) {
-      logError(loggerDNSRemoteAccess, ZV_HERE,
-               "***Can't get ObjectPaths for DNSClient.                 Exiting EnumerateInstanceNames***");
-      return status;
+    if (!fetchEndpoints(operation, factory, ref, clients)) {
+      return fail(operation,
+                  "***Can't get ObjectPaths for DNSClient.                 Exiting EnumerateInstanceNames***");
     }
-    for (unsigned short c = 0; c < count16(clients); ++c) {
-      CMPIObjectPath* client = clients.at(c);
-      if (isMissing(client, loggerDNSRemoteAccess, ZV_HERE, "CMPIObjectPath is NULL for DNSClient")) return status;
+    for (CMPIObjectPath* client : counted16(clients)) {
+      if (isMissing(operation, client, "CMPIObjectPath is NULL for DNSClient")) return operation.status;
       setNameSpace(client, nameSpace);
-      CMPIObjectPath* path = newHostPath(broker, nameSpace, remoteAccessAvailableToElementClass, &status);
-      if (isMissing(path, loggerDNSRemoteAccess, ZV_HERE,
-                    "Create CMPIObjectPath failed for RemoteAccessAvailableToElement.")) {
-        return status;
+      CMPIObjectPath* path = newHostPath(broker, nameSpace, remoteAccessAvailableToElementClass, &operation.status);
+      if (isMissing(operation, path, "Create CMPIObjectPath failed for RemoteAccessAvailableToElement.")) {
+        return operation.status;
       }
-      addReferenceKey(path, "Antecedent", server);
-      addReferenceKey(path, "Dependent", client);
-      returnObjectPath(result, path);
+      returnPairPath(operation, path, "Antecedent", server, "Dependent", client);
     }
   }
-  ZV_PROVIDER_EXIT(loggerDNSRemoteAccess);  // before it is done, in both enumerations
-  returnDone(result);
-  return status;
+  return endEnumeration(operation);
 }
 
-static CMPIStatus DNSRemoteAccessAvailableToElement_EnumInstances(CMPIInstanceMI*, const CMPIContext*,
+static CMPIStatus DNSRemoteAccessAvailableToElement_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                                   const CMPIResult* result, const CMPIObjectPath* ref,
                                                                   const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSRemoteAccess);
-  std::vector<CMPIInstance*> instances;
-  if (RemoteAccessAvailableToElementCMPIInstances(ref, properties, instances) == 0) returnAll(result, instances);
-  ZV_PROVIDER_EXIT(loggerDNSRemoteAccess);
-  returnDone(result);
-  return kStatusOk;
+  const Operation operation = ZV_OPERATION(context, result, ref);
+  returnBuilt(operation, RemoteAccessAvailableToElementCMPIInstances, properties);
+  return endEnumeration(operation);
 }
 
-static CMPIStatus DNSRemoteAccessAvailableToElement_GetInstance(CMPIInstanceMI*, const CMPIContext*,
+static CMPIStatus DNSRemoteAccessAvailableToElement_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
                                                                 const CMPIResult* result, const CMPIObjectPath* ref,
                                                                 const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSRemoteAccess);
-  CMPIStatus status = kStatusOk;
-  std::vector<CMPIInstance*> instances;
-  if (keyCountOf(ref, &status) == 0) {
-    logError(loggerDNSRemoteAccess, ZV_HERE, "At least one key should be passed");
-  } else if (RemoteAccessAvailableToElementCMPIInstances(ref, properties, instances) == 0) {
-    returnFirstEqual(result, ref, instances, true, &status);
-  }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSRemoteAccess);
-  return status;
+  Operation operation = ZV_OPERATION(context, result, ref);
+  returnEqualBuilt(operation, RemoteAccessAvailableToElementCMPIInstances, properties);
+  return end(operation);
 }
 
 // The four operations below never call returnDone.
 
 // Of the far end's objects those on the source's system go out.
-static CMPIStatus DNSRemoteAccessAvailableToElement_Associators(CMPIAssociationMI*, const CMPIContext*,
+static CMPIStatus DNSRemoteAccessAvailableToElement_Associators(CMPIAssociationMI*, const CMPIContext* context,
                                                                 const CMPIResult* result, const CMPIObjectPath* ref,
                                                                 const char* assocClass, const char* resultClass,
                                                                 const char*, const char*, const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSRemoteAccess);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd = factory.get_assoc_targetClass_ObjectPath(
-      broker, ref, associationOr(assocClass, remoteAccessAvailableToElementClass), resultClass, &status);
-  if (isMissing(farEnd, loggerDNSRemoteAccess, ZV_HERE, "Object Path is NULL in Associators.")) return status;
-
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  const std::string systemName = keyText(ref, "SystemName", &status);
+  const FarEnd farEnd =
+      resolveFarEnd(operation, factory, associationOr(assocClass, remoteAccessAvailableToElementClass), resultClass,
+                    "Object Path is NULL in Associators.");
+  if (!isGood(farEnd.path)) return operation.status;
+  const std::string systemName = sourceKey(operation, "SystemName");
   std::vector<CMPIInstance*> instances;
-  if (farEndClass == remoteServiceAccessPointClass) {
-    if (!passesResultClass(resultClass, remoteServiceAccessPointClass, "CIM_RemoteServiceAccessPoint")) return status;
-    instances.reserve(factory.getNumberOfDNSServerInstances());
-    if (factory.getAllDNSServerCMPIInstances(broker, farEnd, properties, false, instances, &status) != 0) {
-      return status;  // without a word of its own
+  if (farEnd.className == remoteServiceAccessPointClass) {
+    if (!passesResultClass(resultClass, remoteServiceAccessPointClass, "CIM_RemoteServiceAccessPoint")) {
+      return operation.status;
     }
-  } else if (farEndClass == dnsProtocolEndPointClass) {
-    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) return status;
-    instances.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIInstances(broker, farEnd, properties, false, instances, &status) != 0) {
-      logError(loggerDNSRemoteAccess, ZV_HERE, "getAllDNSClientCMPIInstances Failed");
-      return status;
+    if (!fetchServers(operation, factory, farEnd.path, properties, instances)) return operation.status;
+  } else if (farEnd.className == dnsProtocolEndPointClass) {
+    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) return operation.status;
+    if (!fetchEndpoints(operation, factory, farEnd.path, properties, instances)) {
+      return fail(operation, "getAllDNSClientCMPIInstances Failed");
     }
   }
-  for (unsigned short i = 0; i < count16(instances); ++i) {
-    const CMPIInstance* instance = instances.at(i);
-    if (propertyText(instance, "SystemName", &status) == systemName) returnInstance(result, instance);
+  for (const CMPIInstance* instance : counted16(instances)) {
+    if (propertyText(instance, "SystemName", &operation.status) == systemName) returnInstance(result, instance);
   }
-  ZV_PROVIDER_EXIT(loggerDNSRemoteAccess);
-  return status;
+  return endWithoutDone(operation);
 }
 
-static CMPIStatus DNSRemoteAccessAvailableToElement_AssociatorNames(CMPIAssociationMI*, const CMPIContext*,
+static CMPIStatus DNSRemoteAccessAvailableToElement_AssociatorNames(CMPIAssociationMI*, const CMPIContext* context,
                                                                     const CMPIResult* result, const CMPIObjectPath* ref,
                                                                     const char* assocClass, const char* resultClass,
                                                                     const char*, const char*) {
-  ZV_PROVIDER_ENTRY(loggerDNSRemoteAccess);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd = factory.get_assoc_targetClass_ObjectPath(
-      broker, ref, associationOr(assocClass, remoteAccessAvailableToElementClass), resultClass, &status);
-  if (isMissing(farEnd, loggerDNSRemoteAccess, ZV_HERE, "Object Path is NULL in AssociatorNames.")) return status;
-
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  const std::string systemName = keyText(ref, "SystemName", &status);
+  const FarEnd farEnd =
+      resolveFarEnd(operation, factory, associationOr(assocClass, remoteAccessAvailableToElementClass), resultClass,
+                    "Object Path is NULL in AssociatorNames.");
+  if (!isGood(farEnd.path)) return operation.status;
+  const std::string systemName = sourceKey(operation, "SystemName");
   std::vector<CMPIObjectPath*> paths;
-  if (farEndClass == remoteServiceAccessPointClass) {
-    if (!passesResultClass(resultClass, remoteServiceAccessPointClass, "CIM_RemoteServiceAccessPoint")) return status;
-    paths.reserve(factory.getNumberOfDNSServerInstances());
-    if (factory.getAllDNSServerCMPIObjPaths(broker, farEnd, paths, &status) != 0) return status;
-  } else if (farEndClass == dnsProtocolEndPointClass) {
-    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) return status;
-    paths.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIObjPaths(broker, farEnd, paths, &status) != 0) return status;
+  if (farEnd.className == remoteServiceAccessPointClass) {
+    if (!passesResultClass(resultClass, remoteServiceAccessPointClass, "CIM_RemoteServiceAccessPoint")) {
+      return operation.status;
+    }
+    if (!fetchServers(operation, factory, farEnd.path, paths)) return operation.status;
+  } else if (farEnd.className == dnsProtocolEndPointClass) {
+    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) return operation.status;
+    if (!fetchEndpoints(operation, factory, farEnd.path, paths)) return operation.status;
   }
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  for (unsigned short i = 0; i < count16(paths); ++i) {
-    CMPIObjectPath* path = paths.at(i);
-    if (keyText(path, "SystemName", &status) != systemName) continue;
+  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  for (CMPIObjectPath* path : counted16(paths)) {
+    if (keyText(path, "SystemName", &operation.status) != systemName) continue;
     setNameSpaceAndHost(path, nameSpace);
     returnObjectPath(result, path);
   }
-  ZV_PROVIDER_EXIT(loggerDNSRemoteAccess);
-  return status;
+  return endWithoutDone(operation);
 }
 
-namespace {
-
-// By the class of the far end, the server is the antecedent and the endpoint the dependent.
-void setEnds(const CMPIInstance* reference, const std::string& farEndClass, const CMPIObjectPath* source,
-             const CMPIObjectPath* farEnd) {
-  const bool farEndIsServer = farEndClass == remoteServiceAccessPointClass;
-  setReference(reference, "Antecedent", farEndIsServer ? farEnd : source);
-  setReference(reference, "Dependent", farEndIsServer ? source : farEnd);
+// A reference to one object of the far end: the server is the antecedent and the endpoint the dependent.
+static void setEnds(const CMPIInstance* reference, const FarEnd& farEnd, const CMPIObjectPath* source,
+                    const CMPIObjectPath* target) {
+  const bool farEndIsServer = farEnd.className == remoteServiceAccessPointClass;
+  setPair(reference, "Antecedent", farEndIsServer ? target : source, "Dependent", farEndIsServer ? source : target);
 }
 
-}  // namespace
+// The references and their names are two walks, since the first makes instances of keys alone and takes their paths.
+// Neither filters: the source need not exist. OrderOfAccess is for the enumerations alone.
 
-// No filter of any kind: the source need not exist. OrderOfAccess is for the enumerations alone.
-static CMPIStatus DNSRemoteAccessAvailableToElement_References(CMPIAssociationMI*, const CMPIContext*,
+static CMPIStatus DNSRemoteAccessAvailableToElement_References(CMPIAssociationMI*, const CMPIContext* context,
                                                                const CMPIResult* result, const CMPIObjectPath* ref,
                                                                const char*, const char*, const char**) {
-  ZV_PROVIDER_ENTRY(loggerDNSRemoteAccess);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd =
-      factory.get_assoc_targetClass_ObjectPath(broker, ref, remoteAccessAvailableToElementClass, nullptr, &status);
-  CMPIObjectPath* association =
-      newHostPath(broker, nameSpaceOf(ref, &status), remoteAccessAvailableToElementClass, &status);
-  if (isMissing(farEnd, loggerDNSRemoteAccess, ZV_HERE, "Object Path is NULL in References.")) return status;
-
-  const std::string farEndClass = classNameOf(farEnd, &status);
-  std::vector<CMPIInstance*> instances;  // of keys alone
-  if (farEndClass == remoteServiceAccessPointClass) {
-    instances.reserve(factory.getNumberOfDNSServerInstances());
-    if (factory.getAllDNSServerCMPIInstances(broker, farEnd, nullptr, true, instances, &status) != 0) {
-      logError(loggerDNSRemoteAccess, ZV_HERE, "getAllDNSServerCMPIInstances Failed");
-      return status;
+  const auto [farEnd, nameSpace, association] =
+      resolveReferences(operation, factory, remoteAccessAvailableToElementClass, newHostPath,
+                        remoteAccessAvailableToElementClass, "Object Path is NULL in References.");
+  if (!isGood(farEnd.path)) return operation.status;
+  std::vector<CMPIInstance*> keys;
+  if (farEnd.className == remoteServiceAccessPointClass) {
+    keys.reserve(factory.getNumberOfDNSServerInstances());
+    if (factory.getAllDNSServerCMPIInstances(broker, farEnd.path, nullptr, true, keys, &operation.status) != 0) {
+      return fail(operation, "getAllDNSServerCMPIInstances Failed");
     }
-  } else if (farEndClass == dnsProtocolEndPointClass) {
-    instances.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIInstances(broker, farEnd, nullptr, true, instances, &status) != 0) {
-      logError(loggerDNSRemoteAccess, ZV_HERE, "getAllDNSClientCMPIInstances Failed");
-      return status;
+  } else if (farEnd.className == dnsProtocolEndPointClass) {
+    keys.reserve(factory.getNumberOfDNSClientInstances());
+    if (factory.getAllDNSClientCMPIInstances(broker, farEnd.path, nullptr, true, keys, &operation.status) != 0) {
+      return fail(operation, "getAllDNSClientCMPIInstances Failed");
     }
   }
-  for (unsigned short i = 0; i < count16(instances); ++i) {
-    CMPIInstance* reference = newInstance(broker, association, &status);
-    setEnds(reference, farEndClass, ref, objectPathOf(instances.at(i), &status));
-    returnInstance(result, reference);
+  for (const CMPIInstance* key : counted16(keys)) {
+    const CMPIInstance* reference = newInstance(broker, association, &operation.status);
+    setEnds(reference, farEnd, ref, objectPathOf(key, &operation.status));
+    deliverInstance(operation, reference, nameSpace);
   }
-  ZV_PROVIDER_EXIT(loggerDNSRemoteAccess);
-  return status;
+  return endWithoutDone(operation);
 }
 
-static CMPIStatus DNSRemoteAccessAvailableToElement_ReferenceNames(CMPIAssociationMI*, const CMPIContext*,
+static CMPIStatus DNSRemoteAccessAvailableToElement_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
                                                                    const CMPIResult* result, const CMPIObjectPath* ref,
                                                                    const char*, const char*) {
-  ZV_PROVIDER_ENTRY(loggerDNSRemoteAccess);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
-  CMPIObjectPath* farEnd =
-      factory.get_assoc_targetClass_ObjectPath(broker, ref, remoteAccessAvailableToElementClass, nullptr, &status);
-  const std::string nameSpace = nameSpaceOf(ref, &status);
-  CMPIObjectPath* association = newHostPath(broker, nameSpace, remoteAccessAvailableToElementClass, &status);
-  if (isMissing(farEnd, loggerDNSRemoteAccess, ZV_HERE, "Object Path is NULL in ReferenceNames.")) return status;
-
-  const std::string farEndClass = classNameOf(farEnd, &status);
+  const auto [farEnd, nameSpace, association] =
+      resolveReferences(operation, factory, remoteAccessAvailableToElementClass, newHostPath,
+                        remoteAccessAvailableToElementClass, "Object Path is NULL in ReferenceNames.");
+  if (!isGood(farEnd.path)) return operation.status;
   std::vector<CMPIObjectPath*> paths;
-  if (farEndClass == remoteServiceAccessPointClass) {
-    paths.reserve(factory.getNumberOfDNSServerInstances());
-    if (factory.getAllDNSServerCMPIObjPaths(broker, farEnd, paths, &status) != 0) {
-      logError(loggerDNSRemoteAccess, ZV_HERE, "getAllDNSServerCMPIObjPaths Failed");
-      return status;
+  if (farEnd.className == remoteServiceAccessPointClass) {
+    if (!fetchServers(operation, factory, farEnd.path, paths)) {
+      return fail(operation, "getAllDNSServerCMPIObjPaths Failed");
     }
-  } else if (farEndClass == dnsProtocolEndPointClass) {
-    paths.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIObjPaths(broker, farEnd, paths, &status) != 0) {
-      logError(loggerDNSRemoteAccess, ZV_HERE, "getAllDNSClientCMPIObjPaths Failed");
-      return status;
+  } else if (farEnd.className == dnsProtocolEndPointClass) {
+    if (!fetchEndpoints(operation, factory, farEnd.path, paths)) {
+      return fail(operation, "getAllDNSClientCMPIObjPaths Failed");
     }
   }
-  for (unsigned short i = 0; i < count16(paths); ++i) {
-    CMPIInstance* reference = newInstance(broker, association, &status);
-    setEnds(reference, farEndClass, ref, paths.at(i));
-    CMPIObjectPath* path = objectPathOf(reference, &status);  // its keys are what the server derives
-    setNameSpaceAndHost(path, nameSpace);
-    returnObjectPath(result, path);
+  for (const CMPIObjectPath* path : counted16(paths)) {
+    const CMPIInstance* reference = newInstance(broker, association, &operation.status);
+    setEnds(reference, farEnd, ref, path);
+    deliverPathOnThisHost(operation, reference, nameSpace);
   }
-  ZV_PROVIDER_EXIT(loggerDNSRemoteAccess);
-  return status;
+  return endWithoutDone(operation);
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSRemoteAccessAvailableToElement)

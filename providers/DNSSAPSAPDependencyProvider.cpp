@@ -44,10 +44,11 @@ static bool DNSSAPSAPDependencyCMPIInstances(const CMPIContext* context, const C
   Operation operation = ZV_OPERATION(context, nullptr, ref);
   DNSClientObjFactory factory;
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
-  CMPIObjectPath* ipClass = newPath(broker, nameSpace, ipInterfaceClass, &operation.status);
-  if (isMissing(operation, ipClass, "Create CMPIObjectPath failed for IpInterfaceClass.")) return false;
   const CMPIEnumeration* ipEndpoints = nullptr;
-  if (!askForNames(operation, ipClass, ipEndpoints)) return false;
+  if (!askForNames(operation, nameSpace, ipInterfaceClass, "Create CMPIObjectPath failed for IpInterfaceClass.",
+                   ipEndpoints)) {
+    return false;
+  }
   while (hasNext(ipEndpoints, &operation.status)) {
     const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &operation.status);
     CMPIInstance* endpoint = nullptr;
@@ -74,10 +75,11 @@ static CMPIStatus DNSSAPSAPDependency_EnumInstanceNames(CMPIInstanceMI*, const C
   Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
-  CMPIObjectPath* ipClass = newPath(broker, nameSpace, ipInterfaceClass, &operation.status);
-  if (isMissing(operation, ipClass, "Create CMPIObjectPath failed for IpInterfaceClass.")) return operation.status;
   const CMPIEnumeration* ipEndpoints = nullptr;
-  if (!askForNames(operation, ipClass, ipEndpoints)) return operation.status;
+  if (!askForNames(operation, nameSpace, ipInterfaceClass, "Create CMPIObjectPath failed for IpInterfaceClass.",
+                   ipEndpoints)) {
+    return operation.status;
+  }
   while (hasNext(ipEndpoints, &operation.status)) {
     const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &operation.status);
     CMPIInstance* endpoint = nullptr;

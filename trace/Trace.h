@@ -6,6 +6,7 @@
 #include <cstdio>
 #include <cstring>
 #include <string>
+#include <tuple>
 #include <type_traits>
 
 namespace ZV {
@@ -161,6 +162,29 @@ template <typename... LabelsAndValues>
 void logExit(const std::string& logger, const LogSite& site, const LabelsAndValues&... labelsAndValues) {
   logWithParameters(logger, site, MSG_EXITING, labelsAndValues...);
 }
+
+// The entry line of a function, which its making writes, and, where the function asks for it, the exit line with the
+// same parameters.
+template <typename... LabelsAndValues>
+class FlowLog {
+ public:
+  FlowLog(const std::string& logger, const LogSite& site, const LabelsAndValues&... labelsAndValues)
+      : logger_(logger), function_(site.function), labelsAndValues_(labelsAndValues...) {
+    logEntry(logger, site, labelsAndValues...);
+  }
+
+  void exit(const Place& place = Place::here()) const {
+    const LogSite site = {function_, place.file, place.line};
+    std::apply([&](const auto&... values) { logExit(logger_, site, values...); }, labelsAndValues_);
+  }
+
+ private:
+  const std::string& logger_;
+  const char* function_;
+  std::tuple<LabelsAndValues...> labelsAndValues_;
+};
+template <typename... LabelsAndValues>
+FlowLog(const std::string&, const LogSite&, LabelsAndValues...) -> FlowLog<LabelsAndValues...>;
 
 inline constexpr const char* kBanner = "==============================================================================";
 static_assert(std::char_traits<char>::length(kBanner) == 78);

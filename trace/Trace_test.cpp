@@ -174,6 +174,24 @@ TEST(ParameterList, LongOneIsCutWithTheLine) {
               StartsWith("EXITING: walk() in model/Sample.cpp [Line: 42],Parameters List: xxx"));
 }
 
+TEST(FlowLog, ExitHasTheParametersOfTheEntryAndThePlaceOfItsOwnStatement) {
+  const RecordingLogger logger;
+  const char* text = "told";
+  const FlowLog flow(kLogger, kSite, " text=", text, " x=", true);
+  EXPECT_THAT(logger.pairs().briefs(), ElementsAre("3000 ENTERING walk, text=told x=1"));
+  flow.exit();
+  const unsigned int line = __LINE__ - 1;
+  EXPECT_EQ(
+      "EXITING: walk() in trace/Trace_test.cpp [Line: " + std::to_string(line) + "],Parameters List:  text=told x=1",
+      logger.pairs().at(1).text);
+}
+
+TEST(FlowLog, MarksNoExitThatItIsNotAskedFor) {
+  const RecordingLogger logger;
+  { const FlowLog flow(kLogger, kSite, " x=", false); }
+  EXPECT_THAT(logger.pairs().briefs(), ElementsAre("3000 ENTERING walk, x=0"));
+}
+
 TEST(ProviderMark, EntryIsTheBannerAndThenTheEnteringLine) {
   const RecordingLogger logger;
   markProviderEntry(kLogger, "DNSClient_EnumInstances", "providers/P.cpp", 9);
