@@ -40,32 +40,6 @@ bool passesResultClass(const char* resultClass, const char* ownName, const char*
   return resultClass == nullptr || strcasecmp(resultClass, ownName) == 0 || strcasecmp(resultClass, cimName) == 0;
 }
 
-bool fetchEndpoints(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                    std::vector<CMPIObjectPath*>& endpoints) {
-  endpoints.reserve(factory.getNumberOfDNSClientInstances());
-  return factory.getAllDNSClientCMPIObjPaths(operation.broker, path, endpoints, &operation.status) == 0;
-}
-
-bool fetchEndpoints(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                    const char** properties, std::vector<CMPIInstance*>& endpoints) {
-  endpoints.reserve(factory.getNumberOfDNSClientInstances());
-  return factory.getAllDNSClientCMPIInstances(operation.broker, path, properties, false, endpoints,
-                                              &operation.status) == 0;
-}
-
-bool fetchServers(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                  std::vector<CMPIObjectPath*>& servers) {
-  servers.reserve(factory.getNumberOfDNSServerInstances());
-  return factory.getAllDNSServerCMPIObjPaths(operation.broker, path, servers, &operation.status) == 0;
-}
-
-bool fetchServers(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                  const char** properties, std::vector<CMPIInstance*>& servers) {
-  servers.reserve(factory.getNumberOfDNSServerInstances());
-  return factory.getAllDNSServerCMPIInstances(operation.broker, path, properties, false, servers, &operation.status) ==
-         0;
-}
-
 bool askForNames(Operation& operation, const CMPIObjectPath* classPath, const CMPIEnumeration*& names,
                  const Place& place) {
   names = enumerateInstanceNames(operation.broker, operation.context, classPath, &operation.status);

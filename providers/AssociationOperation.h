@@ -49,16 +49,7 @@ ReferenceParts resolveReferences(Operation& operation, DNSClientObjFactory& fact
 // name and by that of the CIM class that it stands for, in any case; not by a base class.
 bool passesResultClass(const char* resultClass, const char* ownName, const char* cimName);
 
-// --- What is found at the ends. False where a fetch fails.
-
-bool fetchEndpoints(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                    std::vector<CMPIObjectPath*>& endpoints);
-bool fetchEndpoints(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                    const char** properties, std::vector<CMPIInstance*>& endpoints);
-bool fetchServers(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                  std::vector<CMPIObjectPath*>& servers);
-bool fetchServers(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                  const char** properties, std::vector<CMPIInstance*>& servers);
+// --- What is found at the ends.
 
 // Ask the broker for what another provider serves. False, with an error, where the status has a failing code. The
 // second and the third ask with a new path of the class, and say noPath where it cannot be made.

@@ -8,7 +8,7 @@
 
 namespace ZV {
 
-static const std::string loggerDNSClientProv = "Zorvagent.DNSClientProvider";
+static const std::string logCategory = "Zorvagent.DNSClientProvider";
 static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
 static const char* const setDNSDomainMethod = "SetDNSDomain";
 static const char* const setDNSServerSearchOrderMethod = "SetDNSServerSearchOrder";
@@ -17,103 +17,64 @@ static const char* const setDNSSuffixSearchOrderMethod = "SetDNSSuffixSearchOrde
 // A failure below leaves the result open: neither done nor marked as left, with the status as the broker's calls left
 // it.
 
-static CMPIStatus DNSClient_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+static CMPIStatus DNSClient_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                               const CMPIObjectPath* ref) {
-  ZV_PROVIDER_ENTRY(loggerDNSClientProv);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> paths;
-  paths.reserve(factory.getNumberOfDNSClientInstances());
-  if (factory.getAllDNSClientCMPIObjPaths(broker, ref, paths, &status) != 0) {
-    logError(loggerDNSClientProv, ZV_HERE, "getAllDNSClientCMPIObjPaths Failed");
-    return status;
-  }
+  if (!fetchEndpoints(operation, factory, ref, paths)) return fail(operation, "getAllDNSClientCMPIObjPaths Failed");
   for (const CMPIObjectPath* path : paths) returnObjectPath(result, path);
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSClientProv);
-  return status;
+  return end(operation);
 }
 
-static CMPIStatus DNSClient_EnumInstances(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+static CMPIStatus DNSClient_EnumInstances(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                           const CMPIObjectPath* ref, const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSClientProv);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   DNSClientObjFactory factory;
   std::vector<CMPIInstance*> instances;
-  instances.reserve(factory.getNumberOfDNSClientInstances());
-  if (factory.getAllDNSClientCMPIInstances(broker, ref, properties, false, instances, &status) != 0) {
-    logError(loggerDNSClientProv, ZV_HERE, "getAllDNSClientCMPIInstances Failed");
-    return status;
+  if (!fetchEndpoints(operation, factory, ref, properties, instances)) {
+    return fail(operation, "getAllDNSClientCMPIInstances Failed");
   }
   for (const CMPIInstance* instance : instances) returnInstance(result, instance);
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSClientProv);
-  return status;
+  return end(operation);
 }
 
-namespace {
-
-// The name alone decides; the other keys of the path are not looked at. False leaves the result open.
-bool returnByName(CMPIString* name, const CMPIResult* result, const CMPIObjectPath* ref, const char** properties,
-                  const LogSite& site, CMPIStatus* status) {
-  DNSClientObjFactory factory;
-  std::vector<CMPIInstance*> instances;
-  instances.reserve(factory.getNumberOfDNSClientInstances());
-  if (factory.getOneDNSClientCMPIInstance(broker, ref, name, properties, instances, status) != 0) {
-    logError(loggerDNSClientProv, site, "getOneDNSClientCMPIInstance Failed");
-    return false;
-  }
-  for (const CMPIInstance* instance : instances) returnInstance(result, instance);
-  return true;
-}
-
-// All keys count. False leaves the result open.
-bool returnByKeys(const CMPIResult* result, const CMPIObjectPath* ref, const char** properties, const LogSite& site,
-                  CMPIStatus* status) {
-  DNSClientObjFactory factory;
-  std::vector<CMPIInstance*> instances;
-  instances.reserve(factory.getNumberOfDNSClientInstances());
-  if (factory.getAllDNSClientCMPIInstances(broker, ref, properties, false, instances, status) != 0) {
-    logError(loggerDNSClientProv, site, "getAllDNSClientCMPIInstances Failed");
-    return false;
-  }
-  returnFirstEqual(result, ref, instances, false, status);
-  return true;
-}
-
-}  // namespace
-
-static CMPIStatus DNSClient_GetInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+static CMPIStatus DNSClient_GetInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                         const CMPIObjectPath* ref, const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSClientProv);
-  CMPIStatus status = kStatusOk;
-  if (keyCountOf(ref, &status) == 0) {
-    logError(loggerDNSClientProv, ZV_HERE, "At least one key should be passed");
-  } else {
-    const CMPIString* name = stringOf(getKey(ref, "Name", &status));
-    const bool complete = isGood(name)
-                              ? returnByName(const_cast<CMPIString*>(name), result, ref, properties, ZV_HERE, &status)
-                              : returnByKeys(result, ref, properties, ZV_HERE, &status);
-    if (!complete) return status;
+  Operation operation = ZV_OPERATION(context, result, ref);
+  if (keyCountOf(ref, &operation.status) == 0) {
+    complain(operation, "At least one key should be passed");
+    return end(operation);
   }
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSClientProv);
-  return status;
+  const CMPIString* name = stringOf(getKey(ref, "Name", &operation.status));
+  DNSClientObjFactory factory;
+  std::vector<CMPIInstance*> instances;
+  if (isGood(name)) {  // the name alone decides; the other keys are not looked at
+    if (factory.getOneDNSClientCMPIInstance(broker, ref, const_cast<CMPIString*>(name), properties, instances,
+                                            &operation.status) != 0) {
+      return fail(operation, "getOneDNSClientCMPIInstance Failed");
+    }
+    for (const CMPIInstance* instance : instances) returnInstance(result, instance);
+  } else {  // all keys count
+    if (!fetchEndpoints(operation, factory, ref, properties, instances)) {
+      return fail(operation, "getAllDNSClientCMPIInstances Failed");
+    }
+    returnFirstEqual(result, ref, instances, false, &operation.status);
+  }
+  return end(operation);
 }
 
-static CMPIStatus DNSClient_ModifyInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+static CMPIStatus DNSClient_ModifyInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                            const CMPIObjectPath* ref, const CMPIInstance* instance,
                                            const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSClientProv);
-  CMPIStatus status = kStatusOk;
-  const auto rc =
-      static_cast<unsigned short>(modifyDNSProtocolEndpointCMPIInstance(broker, ref, properties, instance, &status));
+  Operation operation = ZV_OPERATION(context, result, ref);
+  const unsigned int rc = modifyDNSProtocolEndpointCMPIInstance(broker, ref, properties, instance, &operation.status);
   if (rc != CMPI_RC_OK) {
-    logError(loggerDNSClientProv, ZV_HERE, "modifyDNSSettingDataCMPIInstance Failed");  // the sibling's text
-    status.rc = static_cast<CMPIrc>(rc);
+    complain(operation, "modifyDNSSettingDataCMPIInstance Failed");
+    operation.status.rc = static_cast<CMPIrc>(rc);
   }
   returnDone(result);
-  return {status.rc, nullptr};  // no exit is marked
+  return {operation.status.rc, nullptr};  // no exit is marked
 }
 
 // True where the method of the endpoint class is meant; its argument is then in data.
@@ -137,8 +98,8 @@ static void returnValue(const CMPIResult* result, unsigned int number) {
 static CMPIStatus DNSClient_InvokeMethod(CMPIMethodMI*, const CMPIContext* context, const CMPIResult* result,
                                          const CMPIObjectPath* objectPath, const char* method, const CMPIArgs* in,
                                          CMPIArgs*) {
-  ZV_PROVIDER_ENTRY(loggerDNSClientProv);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, objectPath);
+  CMPIStatus& status = operation.status;
   const std::string className = classNameOf(objectPath, &status);
   unsigned int value = 0;
   CMPIData data;
@@ -155,12 +116,11 @@ static CMPIStatus DNSClient_InvokeMethod(CMPIMethodMI*, const CMPIContext* conte
     if (status.rc == CMPI_RC_OK) value = factory.setDNSSuffixesSearchOrder(broker, objectPath, data, context, &status);
     returnValue(result, value);
   }
-  ZV_PROVIDER_EXIT(loggerDNSClientProv);
+  markExit(operation);
   returnDone(result);  // after the exit mark, the reverse of the instance operations
   return status;
 }
 
-// Meant to differ from the other cleanups.
 static CMPIStatus DNSClient_MethodCleanup(CMPIMethodMI*, const CMPIContext*, CMPIBoolean) { return kNotSupported; }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSClient)

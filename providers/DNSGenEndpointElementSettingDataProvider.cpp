@@ -123,8 +123,9 @@ static CMPIStatus DNSGenEndpointElementSettingData_Associators(CMPIAssociationMI
     if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndpoint")) return operation.status;
     if (!fetchEndpoints(operation, factory, farEnd.path, properties, instances)) return operation.status;
   } else if (farEnd.className == dnsGeneralSettingDataClass) {
-    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData"))
+    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) {
       return operation.status;
+    }
     if (getAllDNSGeneralSettingDataCMPIInstances(broker, ref, properties, &instances, &operation.status) != 0) {
       return fail(operation, "getAllDNSGeneralSettingDataCMPIInstances Failed");
     }
@@ -153,8 +154,9 @@ static CMPIStatus DNSGenEndpointElementSettingData_AssociatorNames(CMPIAssociati
       returnObjectPath(result, endpoint);
     }
   } else if (farEnd.className == dnsGeneralSettingDataClass) {
-    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData"))
+    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) {
       return operation.status;
+    }
     std::vector<CMPIObjectPath*> settings;
     if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
       return fail(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");

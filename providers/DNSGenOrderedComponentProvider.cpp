@@ -104,8 +104,9 @@ static CMPIStatus DNSGeneralOrderedComponent_Associators(CMPIAssociationMI*, con
                                       resultClass, "Object Path is NULL in Associators.");
   if (!isGood(farEnd.path)) return operation.status;
   if (farEnd.className == ipAssignmentSettingDataClass) {
-    if (!passesResultClass(resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData"))
+    if (!passesResultClass(resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData")) {
       return operation.status;
+    }
     const CMPIEnumeration* assignments = nullptr;
     if (!askForInstances(operation, nameSpaceOf(ref, &operation.status), ipAssignmentSettingDataClass,
                          "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.", assignments)) {
@@ -114,8 +115,9 @@ static CMPIStatus DNSGeneralOrderedComponent_Associators(CMPIAssociationMI*, con
     while (hasNext(assignments, &operation.status))
       returnInstance(result, nextInstance(assignments, &operation.status));
   } else if (farEnd.className == dnsGeneralSettingDataClass) {
-    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData"))
+    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) {
       return operation.status;
+    }
     std::vector<CMPIInstance*> settings;
     if (getAllDNSGeneralSettingDataCMPIInstances(broker, ref, properties, &settings, &operation.status) != 0) {
       return fail(operation, "getAllDNSGeneralSettingDataCMPIInstances Failed");
@@ -135,8 +137,9 @@ static CMPIStatus DNSGeneralOrderedComponent_AssociatorNames(CMPIAssociationMI*,
                                       resultClass, "Object Path is NULL in Associators.");
   if (!isGood(farEnd.path)) return operation.status;
   if (farEnd.className == ipAssignmentSettingDataClass) {
-    if (!passesResultClass(resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData"))
+    if (!passesResultClass(resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData")) {
       return operation.status;
+    }
     const CMPIEnumeration* assignments = nullptr;
     if (!askForNames(operation, nameSpaceOf(ref, &operation.status), ipAssignmentSettingDataClass,
                      "Create CMPIObjectPath failed for ComputerSystem.", assignments)) {
@@ -144,8 +147,9 @@ static CMPIStatus DNSGeneralOrderedComponent_AssociatorNames(CMPIAssociationMI*,
     }
     while (hasNext(assignments, &operation.status)) returnObjectPath(result, nextPath(assignments, &operation.status));
   } else if (farEnd.className == dnsGeneralSettingDataClass) {
-    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData"))
+    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) {
       return operation.status;
+    }
     std::vector<CMPIObjectPath*> settings;
     if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
       return fail(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");

@@ -136,8 +136,9 @@ static CMPIStatus DNSGeneralElementSettingData_Associators(CMPIAssociationMI*, c
     }
     while (hasNext(systems, &operation.status)) returnInstance(result, nextInstance(systems, &operation.status));
   } else if (farEnd.className == dnsGeneralSettingDataClass) {
-    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData"))
+    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) {
       return operation.status;
+    }
     std::vector<CMPIInstance*> settings;
     if (getAllDNSGeneralSettingDataCMPIInstances(broker, ref, properties, &settings, &operation.status) != 0) {
       return fail(operation, "getAllDNSGeneralSettingDataCMPIInstances Failed");
@@ -165,8 +166,9 @@ static CMPIStatus DNSGeneralElementSettingData_AssociatorNames(CMPIAssociationMI
     }
     while (hasNext(systems, &operation.status)) returnObjectPath(result, nextPath(systems, &operation.status));
   } else if (farEnd.className == dnsGeneralSettingDataClass) {
-    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData"))
+    if (!passesResultClass(resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) {
       return operation.status;
+    }
     std::vector<CMPIObjectPath*> settings;
     if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
       return fail(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");

@@ -6,72 +6,58 @@
 
 namespace ZV {
 
-static const std::string loggerDNSGeneralSettingDataProv = "Zorvagent.DNSGeneralSettingDataProvider";
+static const std::string logCategory = "Zorvagent.DNSGeneralSettingDataProvider";
 
 // A failure below leaves the result open: neither done nor marked as left, with the status as the broker's calls left
 // it.
 
-static CMPIStatus DNSGeneralSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
-                                                          const CMPIObjectPath* ref) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralSettingDataProv);
-  CMPIStatus status = kStatusOk;
+static CMPIStatus DNSGeneralSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
+                                                          const CMPIResult* result, const CMPIObjectPath* ref) {
+  Operation operation = ZV_OPERATION(context, result, ref);
   std::vector<CMPIObjectPath*> paths;
-  if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &paths, &status) != 0) {
-    logError(loggerDNSGeneralSettingDataProv, ZV_HERE, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
-    return status;
+  if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &paths, &operation.status) != 0) {
+    return fail(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
   }
   returnAll(result, paths);
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralSettingDataProv);
-  return status;
+  return end(operation);
 }
 
-static CMPIStatus DNSGeneralSettingData_EnumInstances(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
-                                                      const CMPIObjectPath* ref, const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralSettingDataProv);
-  CMPIStatus status = kStatusOk;
+static CMPIStatus DNSGeneralSettingData_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
+                                                      const CMPIResult* result, const CMPIObjectPath* ref,
+                                                      const char** properties) {
+  Operation operation = ZV_OPERATION(context, result, ref);
   std::vector<CMPIInstance*> instances;
-  if (getAllDNSGeneralSettingDataCMPIInstances(broker, ref, properties, &instances, &status) != 0) {
-    logError(loggerDNSGeneralSettingDataProv, ZV_HERE, "getAllDNSGeneralSettingDataCMPIInstances Failed");
-    return status;
+  if (getAllDNSGeneralSettingDataCMPIInstances(broker, ref, properties, &instances, &operation.status) != 0) {
+    return fail(operation, "getAllDNSGeneralSettingDataCMPIInstances Failed");
   }
   returnAll(result, instances);
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralSettingDataProv);
-  return status;
+  return end(operation);
 }
 
-static CMPIStatus DNSGeneralSettingData_GetInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
-                                                    const CMPIObjectPath* ref, const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralSettingDataProv);
-  CMPIStatus status = kStatusOk;
+static CMPIStatus DNSGeneralSettingData_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
+                                                    const CMPIResult* result, const CMPIObjectPath* ref,
+                                                    const char** properties) {
+  Operation operation = ZV_OPERATION(context, result, ref);
   std::vector<CMPIInstance*> instances;
-  if (getOneDNSGeneralSettingDataCMPIInstance(broker, ref, properties, &instances, &status) != 0) {
-    logError(loggerDNSGeneralSettingDataProv, ZV_HERE, "getOneDNSGeneralSettingDataCMPIInstance Failed");
-    return status;
+  if (getOneDNSGeneralSettingDataCMPIInstance(broker, ref, properties, &instances, &operation.status) != 0) {
+    return fail(operation, "getOneDNSGeneralSettingDataCMPIInstance Failed");
   }
   returnAll(result, instances);
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSGeneralSettingDataProv);
-  return status;
+  return end(operation);
 }
 
 // Unlike its siblings this modification keeps its own rc to itself: the client gets what the broker's calls left in the
 // status, and a failure leaves the result open.
-static CMPIStatus DNSGeneralSettingData_ModifyInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
-                                                       const CMPIObjectPath* ref, const CMPIInstance* instance,
-                                                       const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSGeneralSettingDataProv);
-  CMPIStatus status = kStatusOk;
-  const auto rc =
-      static_cast<unsigned short>(modifyDNSGeneralSettingDataCMPIInstance(broker, ref, properties, instance, &status));
+static CMPIStatus DNSGeneralSettingData_ModifyInstance(CMPIInstanceMI*, const CMPIContext* context,
+                                                       const CMPIResult* result, const CMPIObjectPath* ref,
+                                                       const CMPIInstance* instance, const char** properties) {
+  Operation operation = ZV_OPERATION(context, result, ref);
+  const unsigned int rc = modifyDNSGeneralSettingDataCMPIInstance(broker, ref, properties, instance, &operation.status);
   if (rc != CMPI_RC_OK) {
-    logError(loggerDNSGeneralSettingDataProv, ZV_HERE,
-             "modifyDNSSettingDataCMPIInstance Failed");  // the sibling's text
-    return status;
+    return fail(operation, "modifyDNSSettingDataCMPIInstance Failed");
   }
   returnDone(result);
-  return {status.rc, nullptr};  // no exit is marked
+  return {operation.status.rc, nullptr};  // no exit is marked
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSGeneralSettingData)

@@ -115,8 +115,9 @@ static CMPIStatus DNSOrderedComponent_Associators(CMPIAssociationMI*, const CMPI
   const std::string sourceID = sourceKey(operation, "InstanceID");
   std::string target;
   if (farEnd.className == ipAssignmentSettingDataClass) {
-    if (!passesResultClass(resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData"))
+    if (!passesResultClass(resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData")) {
       return operation.status;
+    }
     const CMPIEnumeration* assignments = nullptr;
     if (!askForInstances(operation, nameSpaceOf(ref, &operation.status), ipAssignmentSettingDataClass,
                          "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.", assignments)) {
@@ -154,8 +155,9 @@ static CMPIStatus DNSOrderedComponent_AssociatorNames(CMPIAssociationMI*, const 
   const std::string sourceID = sourceKey(operation, "InstanceID");
   std::string target;
   if (farEnd.className == ipAssignmentSettingDataClass) {
-    if (!passesResultClass(resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData"))
+    if (!passesResultClass(resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData")) {
       return operation.status;
+    }
     const CMPIEnumeration* assignments = nullptr;
     if (!askForNames(operation, nameSpaceOf(ref, &operation.status), ipAssignmentSettingDataClass,
                      "Create CMPIObjectPath failed for ComputerSystem.", assignments)) {

@@ -6,69 +6,55 @@
 
 namespace ZV {
 
-static const std::string loggerDNSSettingDataProv = "Zorvagent.DNSSettingDataProvider";
+static const std::string logCategory = "Zorvagent.DNSSettingDataProvider";
 
 // A failure below leaves the result open: neither done nor marked as left, with the status as the broker's calls left
 // it.
 
-static CMPIStatus DNSSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
-                                                   const CMPIObjectPath* ref) {
-  ZV_PROVIDER_ENTRY(loggerDNSSettingDataProv);
-  CMPIStatus status = kStatusOk;
+static CMPIStatus DNSSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
+                                                   const CMPIResult* result, const CMPIObjectPath* ref) {
+  Operation operation = ZV_OPERATION(context, result, ref);
   std::vector<CMPIObjectPath*> paths;
-  if (getAllDNSSettingDataCMPIObjectPaths(broker, ref, &paths, &status) != 0) {
-    logError(loggerDNSSettingDataProv, ZV_HERE, "getAllDNSSettingDataCMPIInstances Failed");  // one text for both
-    return status;
+  if (getAllDNSSettingDataCMPIObjectPaths(broker, ref, &paths, &operation.status) != 0) {
+    return fail(operation, "getAllDNSSettingDataCMPIInstances Failed");
   }
   returnAll(result, paths);
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSSettingDataProv);
-  return status;
+  return end(operation);
 }
 
-static CMPIStatus DNSSettingData_EnumInstances(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+static CMPIStatus DNSSettingData_EnumInstances(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                                const CMPIObjectPath* ref, const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSSettingDataProv);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   std::vector<CMPIInstance*> instances;
-  if (getAllDNSSettingDataCMPIInstances(broker, ref, properties, &instances, &status) != 0) {
-    logError(loggerDNSSettingDataProv, ZV_HERE, "getAllDNSSettingDataCMPIInstances Failed");
-    return status;
+  if (getAllDNSSettingDataCMPIInstances(broker, ref, properties, &instances, &operation.status) != 0) {
+    return fail(operation, "getAllDNSSettingDataCMPIInstances Failed");
   }
   returnAll(result, instances);
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSSettingDataProv);
-  return status;
+  return end(operation);
 }
 
-static CMPIStatus DNSSettingData_GetInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+static CMPIStatus DNSSettingData_GetInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                              const CMPIObjectPath* ref, const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSSettingDataProv);
-  CMPIStatus status = kStatusOk;
+  Operation operation = ZV_OPERATION(context, result, ref);
   CMPIInstance* instance = nullptr;
-  if (getOneDNSSettingDataCMPIInstance(broker, ref, properties, &instance, &status) != 0) {
-    logError(loggerDNSSettingDataProv, ZV_HERE, "getOneDNSSettingDataCMPIInstance Failed");
-    return status;
+  if (getOneDNSSettingDataCMPIInstance(broker, ref, properties, &instance, &operation.status) != 0) {
+    return fail(operation, "getOneDNSSettingDataCMPIInstance Failed");
   }
   returnInstance(result, instance);
-  returnDone(result);
-  ZV_PROVIDER_EXIT(loggerDNSSettingDataProv);
-  return status;
+  return end(operation);
 }
 
-static CMPIStatus DNSSettingData_ModifyInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+static CMPIStatus DNSSettingData_ModifyInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                                 const CMPIObjectPath* ref, const CMPIInstance* instance,
                                                 const char** properties) {
-  ZV_PROVIDER_ENTRY(loggerDNSSettingDataProv);
-  CMPIStatus status = kStatusOk;
-  const auto rc =
-      static_cast<unsigned short>(modifyDNSSettingDataCMPIInstance(broker, ref, properties, instance, &status));
+  Operation operation = ZV_OPERATION(context, result, ref);
+  const unsigned int rc = modifyDNSSettingDataCMPIInstance(broker, ref, properties, instance, &operation.status);
   if (rc != CMPI_RC_OK) {
-    logError(loggerDNSSettingDataProv, ZV_HERE, "modifyDNSSettingDataCMPIInstance Failed");
-    status.rc = static_cast<CMPIrc>(rc);
+    complain(operation, "modifyDNSSettingDataCMPIInstance Failed");
+    operation.status.rc = static_cast<CMPIrc>(rc);
   }
   returnDone(result);
-  return {status.rc, nullptr};  // no exit is marked
+  return {operation.status.rc, nullptr};  // no exit is marked
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSSettingData)

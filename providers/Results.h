@@ -1,11 +1,24 @@
-// Handing out what an operation has gathered.
+// Gathering what the factory has, and handing it out.
 #pragma once
 
 #include <cmpidt.h>
 
 #include <vector>
 
+#include "factory/DNSClientObjFactory.h"
+#include "providers/Operation.h"
+
 namespace ZV {
+
+// All endpoints or servers, with the namespace of the path. False where the factory fails.
+bool fetchEndpoints(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
+                    std::vector<CMPIObjectPath*>& endpoints);
+bool fetchEndpoints(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
+                    const char** properties, std::vector<CMPIInstance*>& endpoints);
+bool fetchServers(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
+                  std::vector<CMPIObjectPath*>& servers);
+bool fetchServers(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
+                  const char** properties, std::vector<CMPIInstance*>& servers);
 
 // Every element in order, null ones included; the elements are counted in 16 bits.
 void returnAll(const CMPIResult* result, const std::vector<CMPIInstance*>& instances);
