@@ -77,16 +77,15 @@ const Target* findTarget(const std::string& sourceClass, const char* association
 const char* DNSClientObjFactory::get_assoc_targetClass_Name(const CMPIBroker* _broker, const CMPIObjectPath* ref,
                                                             const char* _RefLeftClass, const char* _RefRightClass,
                                                             CMPIStatus* rc) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " _broker=", _broker, " ref=", ref, " _RefLeftClass=", _RefLeftClass,
-           " _RefRightClass=", _RefRightClass, " rc=", rc);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " _broker=", _broker, " ref=", ref, " _RefLeftClass=", _RefLeftClass,
+                     " _RefRightClass=", _RefRightClass, " rc=", rc);
   const Target* target = findTarget(classNameOf(ref, rc), _RefLeftClass);
   if (target == nullptr) {
     logMessage(loggerDNSObjFactory, ZV_HERE, LOG_LEVEL_DETAIL, "Target Class is EMPTY");
   } else if (target->text != nullptr) {
     logMessage(loggerDNSObjFactory, ZV_HERE, LOG_LEVEL_DETAIL, target->text);
   }
-  logExit(loggerDNSObjFactory, ZV_HERE, " _broker=", _broker, " ref=", ref, " _RefLeftClass=", _RefLeftClass,
-          " _RefRightClass=", _RefRightClass, " rc=", rc);
+  flow.exit();
   return target != nullptr ? target->targetClass : "";
 }
 

@@ -6,6 +6,7 @@
 #include <strings.h>
 
 #include "factory/CmpiSupport.h"
+#include "factory/SettingProperties.h"
 #include "trace/Trace.h"
 
 namespace ZV {
@@ -59,21 +60,19 @@ unsigned short DNSClientObjFactory::getAllDNSClientCMPIObjPaths(const CMPIBroker
     addTextKey(path, "Name", client.getDNSClientName());
     objectPaths.push_back(path);
   }
-  return 0;  // unlike its siblings this function marks no exit
+  return 0;
 }
 
 namespace {
 
 // False where the broker makes no array.
 bool setSuffixes(const CMPIBroker* broker, const CMPIInstance* instance, const std::vector<std::string>& suffixes,
-                 const LogSite& site, CMPIStatus* rc) {
+                 const char* function, CMPIStatus* rc) {
   const unsigned short dnsSuffixesSize = count16(suffixes);
-  CMPIArray* array = newArray(broker, dnsSuffixesSize, CMPI_string, rc);
-  if (array == nullptr) {
-    logError(loggerDNSObjFactory, site, "Create Array for Property DNSSuffixesToAppend failed.");
-    return false;
-  }
-  logVariable(loggerDNSObjFactory, site, "dnsSuffixesSize", dnsSuffixesSize);
+  CMPIArray* array =
+      newPropertyArray(broker, "DNSSuffixesToAppend", dnsSuffixesSize, CMPI_string, ZV_HERE_IN(function), rc);
+  if (array == nullptr) return false;
+  logVariable(loggerDNSObjFactory, ZV_HERE_IN(function), "dnsSuffixesSize", dnsSuffixesSize);
   for (unsigned short i = 0; i < dnsSuffixesSize; ++i) {
     CMPIString* suffix = newString(broker, suffixes[i], rc);
     if (suffix != nullptr) *rc = setTextElement(array, i, suffix);
@@ -82,35 +81,31 @@ bool setSuffixes(const CMPIBroker* broker, const CMPIInstance* instance, const s
   return true;
 }
 
+void setKeys(const CMPIInstance* instance, const DNSClient& dc) {
+  setText(instance, "SystemCreationClassName", dc.getDNSSCCN());
+  setText(instance, "CreationClassName", dnsProtocolEndPointClass);
+  setText(instance, "SystemName", systemNameFor(dc));
+  setText(instance, "Name", dc.getDNSClientName());
+}
+
 }  // namespace
 
 CMPIInstance* DNSClientObjFactory::makeDNSClientInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                                          DNSClient dc, const char** properties, bool isObjPath,
                                                          CMPIStatus* rc) {
-  const auto markExit = [&] {
-    logExit(loggerDNSObjFactory, ZV_HERE_IN("makeDNSClientInstance"), " broker=", broker, " ref=", ref, " dc=", &dc,
-            " properties=", properties, " isObjPath=", isObjPath, " rc=", rc);
-  };
-  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " dc=", &dc, " properties=", properties,
-           " isObjPath=", isObjPath, " rc=", rc);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " dc=", &dc,
+                     " properties=", properties, " isObjPath=", isObjPath, " rc=", rc);
   const WantedProperties wanted(properties, isObjPath);
 
-  CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, rc), dnsProtocolEndPointClass, nullptr);
-  if (!isGood(path)) {
-    markExit();
-    return nullptr;
-  }
+  const CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, rc), dnsProtocolEndPointClass, nullptr);
   CMPIInstance* instance = newInstance(broker, path, nullptr);
   if (!isGood(instance)) {
-    markExit();
+    flow.exit();
     return instance;
   }
   if (!isObjPath) setPropertyFilter(instance, properties, kSystemKeys);
 
-  setText(instance, "SystemCreationClassName", dc.getDNSSCCN());
-  setText(instance, "CreationClassName", dnsProtocolEndPointClass);
-  setText(instance, "SystemName", systemNameFor(dc));
-  setText(instance, "Name", dc.getDNSClientName());
+  setKeys(instance, dc);
   if (wanted("Caption")) setText(instance, "Caption", localised(L"MSGID_DNS_CLIENT_CAPTION"));
   if (wanted("Description")) setText(instance, "Description", localised(L"MSGID_DNS_CLIENT_DESCRIPTION"));
   if (wanted("ProtocolIFType")) setUint16(instance, "ProtocolIFType", dc.getprotocolIFType());
@@ -119,12 +114,13 @@ CMPIInstance* DNSClientObjFactory::makeDNSClientInstance(const CMPIBroker* broke
   if (wanted("NameFormat")) setText(instance, "NameFormat", dc.getNameFormat());
   if (wanted("OtherTypeDescription")) setText(instance, "OtherTypeDescription", dc.getOtherTypeDescription());
   if (wanted("DomainName")) setText(instance, "DomainName", dc.getDomainName());
-  if (wanted("DNSSuffixesToAppend")) {
-    if (!setSuffixes(broker, instance, dc.getDNSSuffixesToAppend(), ZV_HERE, rc)) return instance;
+  if (wanted("DNSSuffixesToAppend") &&
+      !setSuffixes(broker, instance, dc.getDNSSuffixesToAppend(), static_cast<const char*>(__func__), rc)) {
+    return instance;
   }
   if (wanted("EnabledState")) setUint16(instance, "EnabledState", dc.getEnabledState());
   if (wanted("RequestedState")) setUint16(instance, "RequestedState", dc.getRequestedState());
-  markExit();
+  flow.exit();
   return instance;
 }
 
@@ -133,16 +129,15 @@ unsigned short DNSClientObjFactory::getOneDNSClientCMPIInstance(const CMPIBroker
                                                                 const char** properties,
                                                                 std::vector<CMPIInstance*>& instances,
                                                                 CMPIStatus* status) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " objectPath=", objectPath, " key=", key,
-           " properties=", properties, " instances=", &instances, " status=", status);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " objectPath=", objectPath, " key=", key,
+                     " properties=", properties, " instances=", &instances, " status=", status);
   const auto found = dnsClientMap.find(textOf(key, status));
   if (found == dnsClientMap.end()) {
     logError(loggerDNSObjFactory, ZV_HERE, "No DNSClient instance found in the Map");
     return 1;
   }
   instances.push_back(makeDNSClientInstance(broker, objectPath, found->second, properties, false, status));
-  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " objectPath=", objectPath, " key=", key,
-          " properties=", properties, " instances=", &instances, " status=", status);
+  flow.exit();
   return 0;
 }
 
@@ -150,8 +145,8 @@ unsigned short DNSClientObjFactory::getAllDNSClientCMPIInstances(const CMPIBroke
                                                                  const char** properties, bool isObjPath,
                                                                  std::vector<CMPIInstance*>& instances,
                                                                  CMPIStatus* rc) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
-           " isObjPath=", isObjPath, " instances=", &instances, " rc=", rc);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
+                     " isObjPath=", isObjPath, " instances=", &instances, " rc=", rc);
   unsigned short failed = 0;
   if (dnsClientMap.empty()) {
     logError(loggerDNSObjFactory, ZV_HERE, "***No instance found***");
@@ -160,16 +155,15 @@ unsigned short DNSClientObjFactory::getAllDNSClientCMPIInstances(const CMPIBroke
   for (const auto& [name, client] : dnsClientMap) {
     instances.push_back(makeDNSClientInstance(broker, ref, client, properties, isObjPath, rc));
   }
-  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
-          " isObjPath=", isObjPath, " instances=", &instances, " rc=", rc);
+  flow.exit();
   return failed;
 }
 
 unsigned short DNSClientObjFactory::getAllDNSServerCMPIObjPaths(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                                                 std::vector<CMPIObjectPath*>& objectPaths,
                                                                 CMPIStatus* status) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " objectPaths=", &objectPaths,
-           " status=", status);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " objectPaths=", &objectPaths,
+                     " status=", status);
   if (dnsServerMap.empty()) {
     logError(loggerDNSObjFactory, ZV_HERE, "No ObjectPath found");
     return 1;
@@ -187,20 +181,18 @@ unsigned short DNSClientObjFactory::getAllDNSServerCMPIObjPaths(const CMPIBroker
     addTextKey(path, "Name", server.getAccessInfo());
     objectPaths.push_back(path);
   }
-  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " objectPaths=", &objectPaths,
-          " status=", status);
+  flow.exit();
   return 0;
 }
 
 CMPIInstance* DNSClientObjFactory::makeDNSServerInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                                          DNSServer ds, const char** properties, bool isObjPath,
                                                          CMPIStatus* rc) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " ds=", &ds, " properties=", properties,
-           " isObjPath=", isObjPath, " rc=", rc);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " ds=", &ds,
+                     " properties=", properties, " isObjPath=", isObjPath, " rc=", rc);
   const WantedProperties wanted(properties, isObjPath);
 
-  CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, rc), remoteServiceAccessPointClass, nullptr);
-  if (!isGood(path)) return nullptr;
+  const CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, rc), remoteServiceAccessPointClass, nullptr);
   CMPIInstance* instance = newInstance(broker, path, nullptr);
   if (!isGood(instance)) return instance;
   if (!isObjPath) setPropertyFilter(instance, properties, kSystemKeys);
@@ -217,8 +209,7 @@ CMPIInstance* DNSClientObjFactory::makeDNSServerInstance(const CMPIBroker* broke
   if (wanted("InfoFormat")) setUint16(instance, "InfoFormat", ds.getInfoFormat());
   if (wanted("OrderOfAccess")) setUint16(instance, "OrderOfAccess", ds.getOrderOfAccess());
   if (wanted("ElementName")) setText(instance, "ElementName", ds.getElementName());
-  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " ds=", &ds, " properties=", properties,
-          " isObjPath=", isObjPath, " rc=", rc);
+  flow.exit();
   return instance;
 }
 
@@ -227,16 +218,15 @@ unsigned short DNSClientObjFactory::getOneDNSServerCMPIInstance(const CMPIBroker
                                                                 const char** properties,
                                                                 std::vector<CMPIInstance*>& instances,
                                                                 CMPIStatus* status) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " objectPath=", objectPath, " key=", key,
-           " properties=", properties, " instances=", &instances, " status=", status);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " objectPath=", objectPath, " key=", key,
+                     " properties=", properties, " instances=", &instances, " status=", status);
   const auto found = dnsServerMap.find(textOf(key, status));
   if (found == dnsServerMap.end()) {
     logError(loggerDNSObjFactory, ZV_HERE, "No DNS Server instance found in the map");
     return 1;
   }
   instances.push_back(makeDNSServerInstance(broker, objectPath, found->second, properties, false, status));
-  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " objectPath=", objectPath, " key=", key,
-          " properties=", properties, " instances=", &instances, " status=", status);
+  flow.exit();
   return 0;
 }
 
@@ -244,28 +234,27 @@ unsigned short DNSClientObjFactory::getAllDNSServerCMPIInstances(const CMPIBroke
                                                                  const char** properties, bool isObjPath,
                                                                  std::vector<CMPIInstance*>& instances,
                                                                  CMPIStatus* rc) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
-           " isObjPath=", isObjPath, " instances=", &instances, " rc=", rc);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
+                     " isObjPath=", isObjPath, " instances=", &instances, " rc=", rc);
   if (dnsServerMap.empty()) {
     logError(loggerDNSObjFactory, ZV_HERE, "***No instance found***");
-    return 1;  // unlike the endpoints' sibling without marking the exit
+    return 1;
   }
   for (const auto& [address, server] : dnsServerMap) {
     instances.push_back(makeDNSServerInstance(broker, ref, server, properties, isObjPath, rc));
   }
-  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
-          " isObjPath=", isObjPath, " instances=", &instances, " rc=", rc);
+  flow.exit();
   return 0;
 }
 
 unsigned short DNSClientObjFactory::getOrderOfAccess(const CMPIBroker* _broker, CMPIObjectPath* dnsServer,
                                                      CMPIStatus* rc) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " _broker=", _broker, " dnsServer=", dnsServer, " rc=", rc);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " _broker=", _broker, " dnsServer=", dnsServer, " rc=", rc);
   const std::string serverName = keyText(dnsServer, "Name", rc);
   logVariable(loggerDNSObjFactory, ZV_HERE, "serverName", serverName);
   const auto found = dnsServerMap.find(serverName);
   if (found != dnsServerMap.end()) return found->second.getOrderOfAccess();
-  logExit(loggerDNSObjFactory, ZV_HERE, " _broker=", _broker, " dnsServer=", dnsServer, " rc=", rc);
+  flow.exit();
   return 1;  // as for the first server: the caller cannot tell a miss from a hit
 }
 

@@ -17,20 +17,13 @@ std::string generalInstanceID() { return "dnsgen1:" + getSystemName(); }
 
 // False where the broker makes no array.
 bool setSuffixes(const CMPIBroker* broker, const CMPIInstance* instance, const std::vector<std::string>& suffixes,
-                 const LogSite& site, CMPIStatus* status) {
-  const unsigned short count = count16(suffixes);
-  CMPIArray* array = newArray(broker, count, CMPI_string, status);
-  if (array == nullptr) {
-    logError(loggerDNSObjFactory, site, "Create Array for Property DNSSuffixesToAppend failed.");
-    return false;
-  }
-  for (unsigned short i = 0; i < count; ++i) {
-    logVariable(loggerDNSObjFactory, site, "dnsSuf", suffixes[i]);
-    CMPIString* suffix = newString(broker, suffixes[i], status);
-    if (suffix != nullptr) setTextElement(array, i, suffix);
-  }
-  setArray(instance, "DNSSuffixesToAppend", array, CMPI_stringA);
-  return true;
+                 const char* function, CMPIStatus* status) {
+  return setElements(broker, instance, "DNSSuffixesToAppend", CMPI_string, suffixes, ZV_HERE_IN(function), status,
+                     [&](CMPIArray* array, unsigned short i) {
+                       logVariable(loggerDNSObjFactory, ZV_HERE_IN(function), "dnsSuf", suffixes[i]);
+                       CMPIString* suffix = newString(broker, suffixes[i], status);
+                       if (suffix != nullptr) setTextElement(array, i, suffix);
+                     });
 }
 
 void addInstance(const CMPIBroker* broker, const CMPIObjectPath* ref, const char** properties,
@@ -45,7 +38,8 @@ void addInstance(const CMPIBroker* broker, const CMPIObjectPath* ref, const char
 
 unsigned short getAllDNSGeneralSettingDataCMPIObjectPaths(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                                           std::vector<CMPIObjectPath*>* paths, CMPIStatus* status) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " paths=", paths, " status=", status);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " paths=", paths,
+                     " status=", status);
   unsigned short failed = 0;
   DNSGeneralSettingData data;
   if (data) {
@@ -58,19 +52,18 @@ unsigned short getAllDNSGeneralSettingDataCMPIObjectPaths(const CMPIBroker* brok
       failed = 1;
     }
   }
-  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " paths=", paths, " status=", status);
+  flow.exit();
   return failed;
 }
 
 CMPIInstance* makeDNSGeneralSettingDataInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                                 DNSGeneralSettingData data, const char** properties, bool isObjPath,
                                                 CMPIStatus* status) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " data=", &data, " properties=", properties,
-           " isObjPath=", isObjPath, " status=", status);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " data=", &data,
+                     " properties=", properties, " isObjPath=", isObjPath, " status=", status);
   const WantedProperties wanted(properties, isObjPath);
 
-  CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, nullptr), dnsGeneralSettingDataClass, nullptr);
-  if (!isGood(path)) return nullptr;
+  const CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, nullptr), dnsGeneralSettingDataClass, nullptr);
   CMPIInstance* instance = newInstance(broker, path, nullptr);
   if (!isGood(instance)) return instance;
   if (!isObjPath) setPropertyFilter(instance, properties, {"InstanceID"});
@@ -90,35 +83,32 @@ CMPIInstance* makeDNSGeneralSettingDataInstance(const CMPIBroker* broker, const 
   if (wanted("DNSSuffixesToAppend")) {
     std::vector<std::string> suffixes;
     if (data.getDNSSuffixesToAppend(suffixes) && !suffixes.empty() &&
-        !setSuffixes(broker, instance, suffixes, ZV_HERE, status)) {
+        !setSuffixes(broker, instance, suffixes, static_cast<const char*>(__func__), status)) {
       return instance;
     }
   }
-  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " data=", &data, " properties=", properties,
-          " isObjPath=", isObjPath, " status=", status);
+  flow.exit();
   return instance;
 }
 
 unsigned short getOneDNSGeneralSettingDataCMPIInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                                        const char** properties, std::vector<CMPIInstance*>* instances,
                                                        CMPIStatus* status) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
-           " instances=", instances, " status=", status);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
+                     " instances=", instances, " status=", status);
   keyText(ref, "InstanceID", status);  // read and compared with nothing: there is but one instance
   addInstance(broker, ref, properties, instances, status);
-  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
-          " instances=", instances, " status=", status);
+  flow.exit();
   return 0;
 }
 
 unsigned short getAllDNSGeneralSettingDataCMPIInstances(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                                         const char** properties, std::vector<CMPIInstance*>* instances,
                                                         CMPIStatus* status) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
-           " instances=", instances, " status=", status);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
+                     " instances=", instances, " status=", status);
   addInstance(broker, ref, properties, instances, status);
-  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
-          " instances=", instances, " status=", status);
+  flow.exit();
   return 0;
 }
 

@@ -36,7 +36,8 @@ std::vector<std::string> textsOf(const CMPIData& data, CMPIStatus* rc) {
 unsigned int DNSClientObjFactory::setDNSDomainName(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                                    const CMPIString* domainName, const CMPIContext* ctx,
                                                    CMPIStatus* rc) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " _broker=", broker, " ref=", ref, " domainName=", domainName, " ctx=", ctx);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " _broker=", broker, " ref=", ref, " domainName=", domainName,
+                     " ctx=", ctx);
   DNSClient client;
   if (!copyOfNamedClient(ref, client, rc)) {
     logError(loggerDNSObjFactory, ZV_HERE, "DNS Client Map empty");
@@ -47,14 +48,14 @@ unsigned int DNSClientObjFactory::setDNSDomainName(const CMPIBroker* broker, con
     logError(loggerDNSObjFactory, ZV_HERE, "SetDomainName function failed");
     value = 1;
   }
-  logExit(loggerDNSObjFactory, ZV_HERE, " _broker=", broker, " ref=", ref, " domainName=", domainName, " ctx=", ctx);
+  flow.exit();
   return value;
 }
 
 unsigned int DNSClientObjFactory::setDNSSuffixesSearchOrder(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                                             CMPIData suffixes, const CMPIContext* ctx, CMPIStatus* rc) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " _broker=", broker, " ref=", ref, " suffixes=", &suffixes, " ctx=", ctx,
-           " rc=", rc);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " _broker=", broker, " ref=", ref, " suffixes=", &suffixes,
+                     " ctx=", ctx, " rc=", rc);
   DNSClient client;
   if (!copyOfNamedClient(ref, client, rc)) {
     logError(loggerDNSObjFactory, ZV_HERE, "DNS Client Map Empty");
@@ -65,16 +66,15 @@ unsigned int DNSClientObjFactory::setDNSSuffixesSearchOrder(const CMPIBroker* br
     logError(loggerDNSObjFactory, ZV_HERE, "setDNSSuffixSearchOrder function failed");
     value = 1;
   }
-  logExit(loggerDNSObjFactory, ZV_HERE, " _broker=", broker, " ref=", ref, " suffixes=", &suffixes, " ctx=", ctx,
-          " rc=", rc);
+  flow.exit();
   return value;
 }
 
 unsigned int DNSClientObjFactory::setDNSServerSearchOrder(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                                           CMPIData serverAddrs, const CMPIContext* ctx,
                                                           CMPIStatus* rc) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " _broker=", broker, " ref=", ref, " serverAddrs=", &serverAddrs,
-           " ctx=", ctx);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " _broker=", broker, " ref=", ref, " serverAddrs=", &serverAddrs,
+                     " ctx=", ctx);
   DNSClient client;
   if (!copyOfNamedClient(ref, client, rc)) return 1;  // the one of the three that says nothing here
   unsigned int value = 0;
@@ -82,7 +82,7 @@ unsigned int DNSClientObjFactory::setDNSServerSearchOrder(const CMPIBroker* brok
     logError(loggerDNSObjFactory, ZV_HERE, "setDNSServerSearchOrder function failed");
     value = 1;
   }
-  logExit(loggerDNSObjFactory, ZV_HERE, " _broker=", broker, " ref=", ref, " serverAddrs=", &serverAddrs, " ctx=", ctx);
+  flow.exit();
   return value;
 }
 

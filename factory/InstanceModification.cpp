@@ -114,14 +114,13 @@ bool modifyConfigurationName(const std::string& fileName, const CMPIInstance* in
 unsigned int modifyDNSSettingDataCMPIInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                               const char** properties, const CMPIInstance* instance,
                                               CMPIStatus* status) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
-           " instance=", instance, " status=", status);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
+                     " instance=", instance, " status=", status);
   if (isMissing(instance, ZV_HERE)) return CMPI_RC_ERR_FAILED;
 
   std::string fileName;
   if (!findFile(keyText(ref, "InstanceID", status), fileName)) {
-    logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
-            " instance=", instance, " status=", status);
+    flow.exit();
     return CMPI_RC_ERR_FAILED;
   }
   std::string hostname;
@@ -142,16 +141,15 @@ unsigned int modifyDNSSettingDataCMPIInstance(const CMPIBroker* broker, const CM
     modifyDNSValue(fileName, "DNSSERVERS", text);
   }
   if (modifyConfigurationName(fileName, instance, status)) return CMPI_RC_OK;
-  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
-          " instance=", instance, " status=", status);
+  flow.exit();
   return CMPI_RC_ERR_FAILED;
 }
 
 unsigned int modifyDNSGeneralSettingDataCMPIInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                                      const char** properties, const CMPIInstance* instance,
                                                      CMPIStatus* status) {
-  logEntry(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
-           " instance=", instance, " status=", status);
+  const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
+                     " instance=", instance, " status=", status);
   if (isMissing(instance, ZV_HERE)) return CMPI_RC_ERR_FAILED;
 
   keyText(ref, "InstanceID", status);  // read and compared with nothing: there is but one instance
@@ -174,8 +172,7 @@ unsigned int modifyDNSGeneralSettingDataCMPIInstance(const CMPIBroker* broker, c
              "In modifyDNSGeneralSettingDataCMPIInstance function PROPERTY_CONFIGURATION_NAME does not found");
   }
   if (done) return CMPI_RC_OK;
-  logExit(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
-          " instance=", instance, " status=", status);
+  flow.exit();
   return CMPI_RC_ERR_FAILED;
 }
 

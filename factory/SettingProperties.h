@@ -1,10 +1,13 @@
-// Sets a property of a setting data instance from the getter of its cursor, if a request wants it and the getter has
-// it.
+// Properties of instances: those of setting data from the getter of its cursor, if a request wants it and the getter
+// has it, and those that are arrays.
 #pragma once
 
 #include <string>
+#include <vector>
 
 #include "factory/CmpiSupport.h"
+#include "factory/DNSClientObjFactory.h"
+#include "trace/Trace.h"
 
 namespace ZV {
 
@@ -27,6 +30,28 @@ void setBooleanIfWanted(const CMPIInstance* instance, const WantedProperties& wa
                         bool (Cursor::*getter)(bool&)) {
   bool value = false;
   if (wanted(name) && (cursor.*getter)(value)) setBoolean(instance, name, value);
+}
+
+// Null, with an error, where the broker makes none.
+inline CMPIArray* newPropertyArray(const CMPIBroker* broker, const std::string& property, CMPICount size,
+                                   CMPIType elementType, const LogSite& site, CMPIStatus* status) {
+  CMPIArray* array = newArray(broker, size, elementType, status);
+  if (array == nullptr) {
+    logError(loggerDNSObjFactory, site, ("Create Array for Property " + property + " failed.").c_str());
+  }
+  return array;
+}
+
+// Sets an array property to what setElement(array, i) puts in for each element. False, with an error, where the broker
+// makes no array.
+template <typename Element, typename SetElement>
+bool setElements(const CMPIBroker* broker, const CMPIInstance* instance, const char* property, CMPIType elementType,
+                 const std::vector<Element>& elements, const LogSite& site, CMPIStatus* status, SetElement setElement) {
+  CMPIArray* array = newPropertyArray(broker, property, count16(elements), elementType, site, status);
+  if (array == nullptr) return false;
+  for (unsigned short i = 0; i < count16(elements); ++i) setElement(array, i);
+  setArray(instance, property, array, static_cast<CMPIType>(elementType | CMPI_ARRAY));
+  return true;
 }
 
 }  // namespace ZV
