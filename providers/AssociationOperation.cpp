@@ -114,14 +114,19 @@ void deliverPathOnThisHost(Operation& operation, const CMPIInstance* reference, 
   returnObjectPath(operation.result, path);
 }
 
+unsigned short failBuilder(const Operation& operation, const char* text, const Place& place) {
+  complain(operation, text, place);
+  return 1;
+}
+
 void returnBuilt(const Operation& operation, Builder build, const char** properties) {
   std::vector<CMPIInstance*> instances;
-  if (build(operation.context, operation.ref, properties, instances)) returnAll(operation.result, instances);
+  if (build(operation.context, operation.ref, properties, instances) == 0) returnAll(operation.result, instances);
 }
 
 void returnPathsOfBuilt(Operation& operation, Builder build) {
   std::vector<CMPIInstance*> instances;
-  if (!build(operation.context, operation.ref, nullptr, instances)) return;
+  if (build(operation.context, operation.ref, nullptr, instances) != 0) return;
   returnPathsOf(operation.result, instances, &operation.status);
 }
 
@@ -129,7 +134,7 @@ void returnEqualBuilt(Operation& operation, Builder build, const char** properti
   std::vector<CMPIInstance*> instances;
   if (keyCountOf(operation.ref, &operation.status) == 0) {
     complain(operation, "At least one key should be passed", place);
-  } else if (build(operation.context, operation.ref, properties, instances)) {
+  } else if (build(operation.context, operation.ref, properties, instances) == 0) {
     returnFirstEqual(operation.result, operation.ref, instances, true, &operation.status);
   }
 }

@@ -94,9 +94,12 @@ void deliverPath(Operation& operation, const CMPIInstance* reference, const std:
 void deliverPathOnThisHost(Operation& operation, const CMPIInstance* reference, const std::string& nameSpace);
 
 // Gathers all instances of a provider's class. It is an operation of its own in the log, with a status of its own, so
-// that its failures do not reach the client.
-using Builder = bool (*)(const CMPIContext* context, const CMPIObjectPath* ref, const char** properties,
-                         std::vector<CMPIInstance*>& instances);
+// that its failures do not reach the client. Returns 0, or 1 where it failed.
+using Builder = unsigned short (*)(const CMPIContext* context, const CMPIObjectPath* ref, const char** properties,
+                                   std::vector<CMPIInstance*>& instances);
+
+// An error that ends a builder; always 1, its result.
+unsigned short failBuilder(const Operation& operation, const char* text, const Place& place = Place::here());
 
 // All that is built; nothing where the builder fails.
 void returnBuilt(const Operation& operation, Builder build, const char** properties);

@@ -8,7 +8,7 @@
 
 namespace ZV {
 
-static const std::string logCategory = "Zorvagent.DNSClientProvider";
+static const std::string loggerDNSClientProv = "Zorvagent.DNSClientProvider";
 static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
 static const char* const setDNSDomainMethod = "SetDNSDomain";
 static const char* const setDNSServerSearchOrderMethod = "SetDNSServerSearchOrder";
@@ -19,7 +19,7 @@ static const char* const setDNSSuffixSearchOrderMethod = "SetDNSSuffixSearchOrde
 
 static CMPIStatus DNSClient_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                               const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSClientProv, context, result, ref);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> paths;
   if (!fetchEndpoints(operation, factory, ref, paths)) return fail(operation, "getAllDNSClientCMPIObjPaths Failed");
@@ -29,7 +29,7 @@ static CMPIStatus DNSClient_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext
 
 static CMPIStatus DNSClient_EnumInstances(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                           const CMPIObjectPath* ref, const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSClientProv, context, result, ref);
   DNSClientObjFactory factory;
   std::vector<CMPIInstance*> instances;
   if (!fetchEndpoints(operation, factory, ref, properties, instances)) {
@@ -41,7 +41,7 @@ static CMPIStatus DNSClient_EnumInstances(CMPIInstanceMI*, const CMPIContext* co
 
 static CMPIStatus DNSClient_GetInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                         const CMPIObjectPath* ref, const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSClientProv, context, result, ref);
   if (keyCountOf(ref, &operation.status) == 0) {
     complain(operation, "At least one key should be passed");
     return end(operation);
@@ -67,7 +67,7 @@ static CMPIStatus DNSClient_GetInstance(CMPIInstanceMI*, const CMPIContext* cont
 static CMPIStatus DNSClient_ModifyInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                            const CMPIObjectPath* ref, const CMPIInstance* instance,
                                            const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSClientProv, context, result, ref);
   const unsigned int rc = modifyDNSProtocolEndpointCMPIInstance(broker, ref, properties, instance, &operation.status);
   if (rc != CMPI_RC_OK) {
     complain(operation, "modifyDNSSettingDataCMPIInstance Failed");
@@ -98,7 +98,7 @@ static void returnValue(const CMPIResult* result, unsigned int number) {
 static CMPIStatus DNSClient_InvokeMethod(CMPIMethodMI*, const CMPIContext* context, const CMPIResult* result,
                                          const CMPIObjectPath* objectPath, const char* method, const CMPIArgs* in,
                                          CMPIArgs*) {
-  Operation operation = ZV_OPERATION(context, result, objectPath);
+  Operation operation = ZV_OPERATION(loggerDNSClientProv, context, result, objectPath);
   CMPIStatus& status = operation.status;
   const std::string className = classNameOf(objectPath, &status);
   unsigned int value = 0;

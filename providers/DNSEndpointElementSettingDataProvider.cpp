@@ -11,7 +11,7 @@
 
 namespace ZV {
 
-static const std::string logCategory = "Zorvagent.DNSEndpointElementSettingDataProvider";
+static const std::string loggerDNSEndpointElementSettingData = "Zorvagent.DNSEndpointElementSettingDataProvider";
 static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
 static const char* const dnsSettingDataClass = "ZORVA_DNSSettingData";
 static const char* const dnsEndpointElementSettingDataClass = "ZORVA_DNSEndPointElementSettingData";
@@ -43,27 +43,28 @@ bool requireInterfaceOf(const Operation& operation, const std::string& instanceI
 
 }  // namespace
 
-static bool DNSEndpointElementSettingDataCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
-                                                       const char** properties, std::vector<CMPIInstance*>& instances) {
-  Operation operation = ZV_OPERATION(context, nullptr, ref);
+static unsigned short DNSEndpointElementSettingDataCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
+                                                                 const char** properties,
+                                                                 std::vector<CMPIInstance*>& instances) {
+  Operation operation = ZV_OPERATION(loggerDNSEndpointElementSettingData, context, nullptr, ref);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> endpoints;
   if (!fetchEndpoints(operation, factory, ref, endpoints)) {
-    return complain(operation, "Can't get ObjectPaths for DNSClient.             Exiting EnumerateInstanceNames");
+    return failBuilder(operation, "Can't get ObjectPaths for DNSClient.             Exiting EnumerateInstanceNames");
   }
   std::vector<CMPIObjectPath*> settings;
   if (getAllDNSSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
     complain(operation, "getAllDNSSettingDataCMPIObjectPaths failed");
     markExit(operation);
-    return false;
+    return 1;
   }
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
   for (CMPIObjectPath* endpoint : counted16(endpoints)) {
-    if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Server")) return false;
+    if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Server")) return 1;
     setNameSpace(endpoint, nameSpace);  // its host stays as it came
     const std::string name = keyText(endpoint, "Name", &operation.status);
     for (CMPIObjectPath* setting : counted16(settings)) {
-      if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return false;
+      if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return 1;
       std::string interfaceName;
       if (!interfaceOf(keyText(setting, "InstanceID", &operation.status), interfaceName)) continue;
       logValue(operation, "instance_tokens[1]", interfaceName);
@@ -72,7 +73,7 @@ static bool DNSEndpointElementSettingDataCMPIInstances(const CMPIContext* contex
       CMPIInstance* instance = nullptr;
       if (!newBuilt(operation, nameSpace, dnsEndpointElementSettingDataClass,
                     "Create CMPIObjectPath failed for                     DNSEndpointElementSettingData.", instance)) {
-        return false;
+        return 1;
       }
       if (!isGood(instance)) continue;
       setPropertyFilter(instance, properties, {"ManagedElement", "SettingData"});
@@ -81,13 +82,13 @@ static bool DNSEndpointElementSettingDataCMPIInstances(const CMPIContext* contex
     }
   }
   markExit(operation);
-  return true;
+  return 0;
 }
 
 // The paths of what is built: nothing goes out before all is built.
 static CMPIStatus DNSEndpointElementSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                                   const CMPIResult* result, const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSEndpointElementSettingData, context, result, ref);
   returnPathsOfBuilt(operation, DNSEndpointElementSettingDataCMPIInstances);
   return end(operation);
 }
@@ -95,7 +96,7 @@ static CMPIStatus DNSEndpointElementSettingData_EnumInstanceNames(CMPIInstanceMI
 static CMPIStatus DNSEndpointElementSettingData_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                               const CMPIResult* result, const CMPIObjectPath* ref,
                                                               const char** properties) {
-  const Operation operation = ZV_OPERATION(context, result, ref);
+  const Operation operation = ZV_OPERATION(loggerDNSEndpointElementSettingData, context, result, ref);
   returnBuilt(operation, DNSEndpointElementSettingDataCMPIInstances, properties);
   return end(operation);
 }
@@ -103,7 +104,7 @@ static CMPIStatus DNSEndpointElementSettingData_EnumInstances(CMPIInstanceMI*, c
 static CMPIStatus DNSEndpointElementSettingData_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
                                                             const CMPIResult* result, const CMPIObjectPath* ref,
                                                             const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSEndpointElementSettingData, context, result, ref);
   returnEqualBuilt(operation, DNSEndpointElementSettingDataCMPIInstances, properties);
   return end(operation);
 }
@@ -112,7 +113,7 @@ static CMPIStatus DNSEndpointElementSettingData_Associators(CMPIAssociationMI*, 
                                                             const CMPIResult* result, const CMPIObjectPath* ref,
                                                             const char* assocClass, const char* resultClass,
                                                             const char*, const char*, const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSEndpointElementSettingData, context, result, ref);
   DNSClientObjFactory factory;
   const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsEndpointElementSettingDataClass),
                                       resultClass, "Object Path is NULL in Associators.");
@@ -148,7 +149,7 @@ static CMPIStatus DNSEndpointElementSettingData_AssociatorNames(CMPIAssociationM
                                                                 const CMPIResult* result, const CMPIObjectPath* ref,
                                                                 const char* assocClass, const char* resultClass,
                                                                 const char*, const char*) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSEndpointElementSettingData, context, result, ref);
   DNSClientObjFactory factory;
   const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsEndpointElementSettingDataClass),
                                       resultClass, "Object Path is NULL in Associators.");
@@ -251,13 +252,14 @@ static CMPIStatus refer(Operation operation, WalkSettings walkSettings, Deliver 
 static CMPIStatus DNSEndpointElementSettingData_References(CMPIAssociationMI*, const CMPIContext* context,
                                                            const CMPIResult* result, const CMPIObjectPath* ref,
                                                            const char*, const char*, const char**) {
-  return refer(ZV_OPERATION(context, result, ref), referToSettings, deliverInstance);
+  return refer(ZV_OPERATION(loggerDNSEndpointElementSettingData, context, result, ref), referToSettings,
+               deliverInstance);
 }
 
 static CMPIStatus DNSEndpointElementSettingData_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
                                                                const CMPIResult* result, const CMPIObjectPath* ref,
                                                                const char*, const char*) {
-  return refer(ZV_OPERATION(context, result, ref), nameSettings, deliverPath);
+  return refer(ZV_OPERATION(loggerDNSEndpointElementSettingData, context, result, ref), nameSettings, deliverPath);
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSEndpointElementSettingData)

@@ -8,7 +8,7 @@
 
 namespace ZV {
 
-static const std::string logCategory = "Zorvagent.DNSGenEndpointElementSettingDataProvider";
+static const std::string loggerDNSGenEndpointElementSettingData = "Zorvagent.DNSGenEndpointElementSettingDataProvider";
 static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
 static const char* const dnsGeneralSettingDataClass = "ZORVA_DNSGeneralSettingData";
 static const char* const dnsEndpointElementSettingDataClass = "ZORVA_DNSEndPointElementSettingData";
@@ -21,33 +21,33 @@ static void setAll(const CMPIInstance* instance, const CMPIObjectPath* endpoint,
   setUint16(instance, "IsDefault", 1);
 }
 
-static bool DNSGenEndpointElementSettingDataCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
-                                                          const char** properties,
-                                                          std::vector<CMPIInstance*>& instances) {
-  Operation operation = ZV_OPERATION(context, nullptr, ref);
+static unsigned short DNSGenEndpointElementSettingDataCMPIInstances(const CMPIContext* context,
+                                                                    const CMPIObjectPath* ref, const char** properties,
+                                                                    std::vector<CMPIInstance*>& instances) {
+  Operation operation = ZV_OPERATION(loggerDNSGenEndpointElementSettingData, context, nullptr, ref);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> endpoints;
   if (!fetchEndpoints(operation, factory, ref, endpoints)) {
-    return complain(operation, "Can't get ObjectPaths for DNSClient.             Exiting EnumerateInstanceNames");
+    return failBuilder(operation, "Can't get ObjectPaths for DNSClient.             Exiting EnumerateInstanceNames");
   }
   std::vector<CMPIObjectPath*> settings;
   if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
     complain(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
     markExit(operation);
-    return false;
+    return 1;
   }
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
   for (CMPIObjectPath* endpoint : counted16(endpoints)) {
-    if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Server")) return false;
+    if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Server")) return 1;
     setNameSpace(endpoint, nameSpace);  // its host stays as it came
     for (CMPIObjectPath* setting : counted16(settings)) {
-      if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return false;
+      if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return 1;
       setNameSpaceAndHost(setting, nameSpace);
       CMPIInstance* instance = nullptr;
       if (!newBuilt(operation, nameSpace, dnsGenEndpointElementSettingDataClass,
                     "Create CMPIObjectPath failed for                     DNSGenEndpointElementSettingData.",
                     instance)) {
-        return false;
+        return 1;
       }
       if (!isGood(instance)) continue;
       setPropertyFilter(instance, properties, {"ManagedElement", "SettingData"});
@@ -56,14 +56,14 @@ static bool DNSGenEndpointElementSettingDataCMPIInstances(const CMPIContext* con
     }
   }
   markExit(operation);
-  return true;
+  return 0;
 }
 
 // Delivers each path at once: a failure further on leaves what went out, and the result open.
 static CMPIStatus DNSGenEndpointElementSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                                      const CMPIResult* result,
                                                                      const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSGenEndpointElementSettingData, context, result, ref);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> endpoints;
   if (!fetchEndpoints(operation, factory, ref, endpoints)) {
@@ -95,7 +95,7 @@ static CMPIStatus DNSGenEndpointElementSettingData_EnumInstanceNames(CMPIInstanc
 static CMPIStatus DNSGenEndpointElementSettingData_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                                  const CMPIResult* result, const CMPIObjectPath* ref,
                                                                  const char** properties) {
-  const Operation operation = ZV_OPERATION(context, result, ref);
+  const Operation operation = ZV_OPERATION(loggerDNSGenEndpointElementSettingData, context, result, ref);
   returnBuilt(operation, DNSGenEndpointElementSettingDataCMPIInstances, properties);
   return end(operation);
 }
@@ -103,7 +103,7 @@ static CMPIStatus DNSGenEndpointElementSettingData_EnumInstances(CMPIInstanceMI*
 static CMPIStatus DNSGenEndpointElementSettingData_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
                                                                const CMPIResult* result, const CMPIObjectPath* ref,
                                                                const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSGenEndpointElementSettingData, context, result, ref);
   returnEqualBuilt(operation, DNSGenEndpointElementSettingDataCMPIInstances, properties);
   return end(operation);
 }
@@ -112,7 +112,7 @@ static CMPIStatus DNSGenEndpointElementSettingData_Associators(CMPIAssociationMI
                                                                const CMPIResult* result, const CMPIObjectPath* ref,
                                                                const char* assocClass, const char* resultClass,
                                                                const char*, const char*, const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSGenEndpointElementSettingData, context, result, ref);
   DNSClientObjFactory factory;
   const FarEnd farEnd =
       resolveFarEnd(operation, factory, associationOr(assocClass, dnsGenEndpointElementSettingDataClass), resultClass,
@@ -138,7 +138,7 @@ static CMPIStatus DNSGenEndpointElementSettingData_AssociatorNames(CMPIAssociati
                                                                    const CMPIResult* result, const CMPIObjectPath* ref,
                                                                    const char* assocClass, const char* resultClass,
                                                                    const char*, const char*) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSGenEndpointElementSettingData, context, result, ref);
   DNSClientObjFactory factory;
   const FarEnd farEnd =
       resolveFarEnd(operation, factory, associationOr(assocClass, dnsGenEndpointElementSettingDataClass), resultClass,
@@ -199,14 +199,16 @@ static CMPIStatus refer(Operation operation, const char* madeClass, Deliver deli
 static CMPIStatus DNSGenEndpointElementSettingData_References(CMPIAssociationMI*, const CMPIContext* context,
                                                               const CMPIResult* result, const CMPIObjectPath* ref,
                                                               const char*, const char*, const char**) {
-  return refer(ZV_OPERATION(context, result, ref), dnsGenEndpointElementSettingDataClass, deliverInstance);
+  return refer(ZV_OPERATION(loggerDNSGenEndpointElementSettingData, context, result, ref),
+               dnsGenEndpointElementSettingDataClass, deliverInstance);
 }
 
 // The paths are of the sister association's class, the one of single endpoints' settings.
 static CMPIStatus DNSGenEndpointElementSettingData_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
                                                                   const CMPIResult* result, const CMPIObjectPath* ref,
                                                                   const char*, const char*) {
-  return refer(ZV_OPERATION(context, result, ref), dnsEndpointElementSettingDataClass, deliverPath);
+  return refer(ZV_OPERATION(loggerDNSGenEndpointElementSettingData, context, result, ref),
+               dnsEndpointElementSettingDataClass, deliverPath);
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSGenEndpointElementSettingData)

@@ -11,7 +11,7 @@
 
 namespace ZV {
 
-static const std::string logCategory = "Zorvagent.DNSGeneralOrderedComponentProvider";
+static const std::string loggerDNSGeneralOrderedComponent = "Zorvagent.DNSGeneralOrderedComponentProvider";
 static const char* const dnsGeneralSettingDataClass = "ZORVA_DNSGeneralSettingData";
 static const char* const dnsGenOrderedComponentClass = "ZORVA_DNSGenOrderedComponent";
 static const char* const ipAssignmentSettingDataClass = "ZORVA_IPAssignmentSettingData";
@@ -30,34 +30,35 @@ static CMPIObjectPath* firstOf(const std::vector<CMPIObjectPath*>& settings) {
 }
 
 // Without host-wide settings, and with an IP assignment to pair them with, std::out_of_range leaves this function.
-static bool DNSGeneralOrderedComponentCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
-                                                    const char** properties, std::vector<CMPIInstance*>& instances) {
-  Operation operation = ZV_UNMARKED_OPERATION(context, nullptr, ref);
-  const FlowLog flow(logCategory, ZV_HERE, " ref==", ref, " properties==", properties, " ctx==", context,
-                     " instances==", &instances);
+static unsigned short DNSGeneralOrderedComponentCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
+                                                              const char** properties,
+                                                              std::vector<CMPIInstance*>& instances) {
+  Operation operation = ZV_UNMARKED_OPERATION(loggerDNSGeneralOrderedComponent, context, nullptr, ref);
+  const FlowLog flow(loggerDNSGeneralOrderedComponent, ZV_HERE, " ref==", ref, " properties==", properties,
+                     " ctx==", context, " instances==", &instances);
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
   const CMPIEnumeration* assignments = nullptr;
   if (!askForNames(operation, nameSpace, ipAssignmentSettingDataClass,
                    "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.", assignments)) {
-    return false;
+    return 1;
   }
   std::vector<CMPIObjectPath*> settings;
   if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
     complain(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
     markExit(operation);
-    return false;
+    return 1;
   }
   while (hasNext(assignments, &operation.status)) {
     const CMPIObjectPath* assignment = nextPath(assignments, &operation.status);
     keyText(assignment, "InstanceID", &operation.status);  // read, as the other below, and compared with nothing
     CMPIObjectPath* setting = firstOf(settings);
-    if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return false;
+    if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return 1;
     keyText(setting, "InstanceID", &operation.status);
     setNameSpaceAndHost(setting, nameSpace);
     CMPIInstance* instance = nullptr;
     if (!newBuilt(operation, nameSpace, dnsGenOrderedComponentClass,
                   "Create CMPIObjectPath failed for                     DNSGeneralOrderedComponent.", instance)) {
-      return false;
+      return 1;
     }
     if (!isGood(instance)) continue;
     setPropertyFilter(instance, properties, {"GroupComponent", "PartComponent"});
@@ -65,13 +66,13 @@ static bool DNSGeneralOrderedComponentCMPIInstances(const CMPIContext* context, 
     instances.push_back(instance);
   }
   flow.exit();
-  return true;
+  return 0;
 }
 
 // The paths of what is built: nothing goes out before all is built.
 static CMPIStatus DNSGeneralOrderedComponent_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                                const CMPIResult* result, const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSGeneralOrderedComponent, context, result, ref);
   returnPathsOfBuilt(operation, DNSGeneralOrderedComponentCMPIInstances);
   return end(operation);
 }
@@ -79,7 +80,7 @@ static CMPIStatus DNSGeneralOrderedComponent_EnumInstanceNames(CMPIInstanceMI*, 
 static CMPIStatus DNSGeneralOrderedComponent_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                            const CMPIResult* result, const CMPIObjectPath* ref,
                                                            const char** properties) {
-  const Operation operation = ZV_OPERATION(context, result, ref);
+  const Operation operation = ZV_OPERATION(loggerDNSGeneralOrderedComponent, context, result, ref);
   returnBuilt(operation, DNSGeneralOrderedComponentCMPIInstances, properties);
   return end(operation);
 }
@@ -87,7 +88,7 @@ static CMPIStatus DNSGeneralOrderedComponent_EnumInstances(CMPIInstanceMI*, cons
 static CMPIStatus DNSGeneralOrderedComponent_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
                                                          const CMPIResult* result, const CMPIObjectPath* ref,
                                                          const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSGeneralOrderedComponent, context, result, ref);
   returnEqualBuilt(operation, DNSGeneralOrderedComponentCMPIInstances, properties);
   return end(operation);
 }
@@ -98,7 +99,7 @@ static CMPIStatus DNSGeneralOrderedComponent_Associators(CMPIAssociationMI*, con
                                                          const CMPIResult* result, const CMPIObjectPath* ref,
                                                          const char* assocClass, const char* resultClass, const char*,
                                                          const char*, const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSGeneralOrderedComponent, context, result, ref);
   DNSClientObjFactory factory;
   const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsGenOrderedComponentClass),
                                       resultClass, "Object Path is NULL in Associators.");
@@ -131,7 +132,7 @@ static CMPIStatus DNSGeneralOrderedComponent_AssociatorNames(CMPIAssociationMI*,
                                                              const CMPIResult* result, const CMPIObjectPath* ref,
                                                              const char* assocClass, const char* resultClass,
                                                              const char*, const char*) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSGeneralOrderedComponent, context, result, ref);
   DNSClientObjFactory factory;
   const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsGenOrderedComponentClass),
                                       resultClass, "Object Path is NULL in Associators.");
@@ -192,13 +193,13 @@ static CMPIStatus refer(Operation operation, Deliver deliver) {
 static CMPIStatus DNSGeneralOrderedComponent_References(CMPIAssociationMI*, const CMPIContext* context,
                                                         const CMPIResult* result, const CMPIObjectPath* ref,
                                                         const char*, const char*, const char**) {
-  return refer(ZV_OPERATION(context, result, ref), deliverInstance);
+  return refer(ZV_OPERATION(loggerDNSGeneralOrderedComponent, context, result, ref), deliverInstance);
 }
 
 static CMPIStatus DNSGeneralOrderedComponent_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
                                                             const CMPIResult* result, const CMPIObjectPath* ref,
                                                             const char*, const char*) {
-  return refer(ZV_OPERATION(context, result, ref), deliverPath);
+  return refer(ZV_OPERATION(loggerDNSGeneralOrderedComponent, context, result, ref), deliverPath);
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSGeneralOrderedComponent)

@@ -11,7 +11,7 @@
 
 namespace ZV {
 
-static const std::string logCategory = "Zorvagent.DNSGeneralElementSettingDataProvider";
+static const std::string loggerDNSGeneralElementSettingData = "Zorvagent.DNSGeneralElementSettingDataProvider";
 static const char* const computerSystemClass = "ZORVA_ComputerSystem";
 static const char* const dnsGeneralSettingDataClass = "ZORVA_DNSGeneralSettingData";
 static const char* const dnsGeneralElementSettingDataClass = "ZORVA_DNSGeneralElementSettingData";
@@ -23,33 +23,34 @@ static void setAll(const CMPIInstance* instance, const CMPIObjectPath* system, c
   setUint16(instance, "IsDefault", 1);
 }
 
-static bool DNSGeneralElementSettingDataCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
-                                                      const char** properties, std::vector<CMPIInstance*>& instances) {
-  Operation operation = ZV_OPERATION(context, nullptr, ref);
+static unsigned short DNSGeneralElementSettingDataCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
+                                                                const char** properties,
+                                                                std::vector<CMPIInstance*>& instances) {
+  Operation operation = ZV_OPERATION(loggerDNSGeneralElementSettingData, context, nullptr, ref);
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
   const CMPIEnumeration* systems = nullptr;
   if (!askForNames(operation, nameSpace, computerSystemClass, "Create CMPIObjectPath failed for ComputerSystem.",
                    systems)) {
-    return false;
+    return 1;
   }
   std::vector<CMPIObjectPath*> settings;
   if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
     complain(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
     markExit(operation);
-    return false;
+    return 1;
   }
   while (hasNext(systems, &operation.status)) {
     const CMPIObjectPath* system = nextPath(systems, &operation.status);
     const std::string name = keyText(system, "Name", &operation.status);
     for (CMPIObjectPath* setting : counted16(settings)) {
-      if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return false;
+      if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return 1;
       if (keyText(setting, "InstanceID", &operation.status).find(name) == std::string::npos) continue;
       setNameSpaceAndHost(setting, nameSpace);
       CMPIInstance* instance = nullptr;
       if (!newBuilt(operation, nameSpace, dnsGeneralElementSettingDataClass,
                     "Create CMPIObjectPath failed for                         DNSGeneralElementSettingData.",
                     instance)) {
-        return false;
+        return 1;
       }
       if (isGood(instance)) {
         setPropertyFilter(instance, properties, {"ManagedElement", "SettingData"});
@@ -61,13 +62,13 @@ static bool DNSGeneralElementSettingDataCMPIInstances(const CMPIContext* context
     }
   }
   markExit(operation);
-  return true;
+  return 0;
 }
 
 // Delivers each path at once: a failure further on leaves what went out, and the result open.
 static CMPIStatus DNSGeneralElementSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                                  const CMPIResult* result, const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSGeneralElementSettingData, context, result, ref);
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
   const CMPIEnumeration* systems = nullptr;
   if (!askForNames(operation, nameSpace, computerSystemClass, "Create CMPIObjectPath failed for computerSystemClass.",
@@ -103,7 +104,7 @@ static CMPIStatus DNSGeneralElementSettingData_EnumInstanceNames(CMPIInstanceMI*
 static CMPIStatus DNSGeneralElementSettingData_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                              const CMPIResult* result, const CMPIObjectPath* ref,
                                                              const char** properties) {
-  const Operation operation = ZV_OPERATION(context, result, ref);
+  const Operation operation = ZV_OPERATION(loggerDNSGeneralElementSettingData, context, result, ref);
   returnBuilt(operation, DNSGeneralElementSettingDataCMPIInstances, properties);
   return end(operation);
 }
@@ -111,7 +112,7 @@ static CMPIStatus DNSGeneralElementSettingData_EnumInstances(CMPIInstanceMI*, co
 static CMPIStatus DNSGeneralElementSettingData_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
                                                            const CMPIResult* result, const CMPIObjectPath* ref,
                                                            const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSGeneralElementSettingData, context, result, ref);
   returnEqualBuilt(operation, DNSGeneralElementSettingDataCMPIInstances, properties);
   return end(operation);
 }
@@ -122,7 +123,7 @@ static CMPIStatus DNSGeneralElementSettingData_Associators(CMPIAssociationMI*, c
                                                            const CMPIResult* result, const CMPIObjectPath* ref,
                                                            const char* assocClass, const char* resultClass, const char*,
                                                            const char*, const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSGeneralElementSettingData, context, result, ref);
   DNSClientObjFactory factory;
   const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsGeneralElementSettingDataClass),
                                       resultClass, "Object Path is NULL in Associators.");
@@ -152,7 +153,7 @@ static CMPIStatus DNSGeneralElementSettingData_AssociatorNames(CMPIAssociationMI
                                                                const CMPIResult* result, const CMPIObjectPath* ref,
                                                                const char* assocClass, const char* resultClass,
                                                                const char*, const char*) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSGeneralElementSettingData, context, result, ref);
   DNSClientObjFactory factory;
   const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsGeneralElementSettingDataClass),
                                       resultClass, "Object Path is NULL in Associators.");
@@ -211,13 +212,13 @@ static CMPIStatus refer(Operation operation, Deliver deliver) {
 static CMPIStatus DNSGeneralElementSettingData_References(CMPIAssociationMI*, const CMPIContext* context,
                                                           const CMPIResult* result, const CMPIObjectPath* ref,
                                                           const char*, const char*, const char**) {
-  return refer(ZV_OPERATION(context, result, ref), deliverInstance);
+  return refer(ZV_OPERATION(loggerDNSGeneralElementSettingData, context, result, ref), deliverInstance);
 }
 
 static CMPIStatus DNSGeneralElementSettingData_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
                                                               const CMPIResult* result, const CMPIObjectPath* ref,
                                                               const char*, const char*) {
-  return refer(ZV_OPERATION(context, result, ref), deliverPath);
+  return refer(ZV_OPERATION(loggerDNSGeneralElementSettingData, context, result, ref), deliverPath);
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSGeneralElementSettingData)

@@ -6,14 +6,14 @@
 
 namespace ZV {
 
-static const std::string logCategory = "Zorvagent.DNSGeneralSettingDataProvider";
+static const std::string loggerDNSGeneralSettingDataProv = "Zorvagent.DNSGeneralSettingDataProvider";
 
 // A failure below leaves the result open: neither done nor marked as left, with the status as the broker's calls left
 // it.
 
 static CMPIStatus DNSGeneralSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                           const CMPIResult* result, const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSGeneralSettingDataProv, context, result, ref);
   std::vector<CMPIObjectPath*> paths;
   if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &paths, &operation.status) != 0) {
     return fail(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
@@ -25,7 +25,7 @@ static CMPIStatus DNSGeneralSettingData_EnumInstanceNames(CMPIInstanceMI*, const
 static CMPIStatus DNSGeneralSettingData_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                       const CMPIResult* result, const CMPIObjectPath* ref,
                                                       const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSGeneralSettingDataProv, context, result, ref);
   std::vector<CMPIInstance*> instances;
   if (getAllDNSGeneralSettingDataCMPIInstances(broker, ref, properties, &instances, &operation.status) != 0) {
     return fail(operation, "getAllDNSGeneralSettingDataCMPIInstances Failed");
@@ -37,7 +37,7 @@ static CMPIStatus DNSGeneralSettingData_EnumInstances(CMPIInstanceMI*, const CMP
 static CMPIStatus DNSGeneralSettingData_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
                                                     const CMPIResult* result, const CMPIObjectPath* ref,
                                                     const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSGeneralSettingDataProv, context, result, ref);
   std::vector<CMPIInstance*> instances;
   if (getOneDNSGeneralSettingDataCMPIInstance(broker, ref, properties, &instances, &operation.status) != 0) {
     return fail(operation, "getOneDNSGeneralSettingDataCMPIInstance Failed");
@@ -51,7 +51,7 @@ static CMPIStatus DNSGeneralSettingData_GetInstance(CMPIInstanceMI*, const CMPIC
 static CMPIStatus DNSGeneralSettingData_ModifyInstance(CMPIInstanceMI*, const CMPIContext* context,
                                                        const CMPIResult* result, const CMPIObjectPath* ref,
                                                        const CMPIInstance* instance, const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSGeneralSettingDataProv, context, result, ref);
   const unsigned int rc = modifyDNSGeneralSettingDataCMPIInstance(broker, ref, properties, instance, &operation.status);
   if (rc != CMPI_RC_OK) {
     return fail(operation, "modifyDNSSettingDataCMPIInstance Failed");

@@ -13,37 +13,38 @@
 
 namespace ZV {
 
-static const std::string logCategory = "Zorvagent.DNSHostedAccessPointProvider";
+static const std::string loggerDNSHostAccessPoint = "Zorvagent.DNSHostedAccessPointProvider";
 static const char* const computerSystemClass = "ZORVA_ComputerSystem";
 static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
 static const char* const dnsHostedAccessPointClass = "ZORVA_DNSHostedAccessPoint";
 
-static bool DNSHostedAccessPointCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
-                                              const char** properties, std::vector<CMPIInstance*>& instances) {
-  Operation operation = ZV_OPERATION(context, nullptr, ref);
+static unsigned short DNSHostedAccessPointCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
+                                                        const char** properties,
+                                                        std::vector<CMPIInstance*>& instances) {
+  Operation operation = ZV_OPERATION(loggerDNSHostAccessPoint, context, nullptr, ref);
   DNSClientObjFactory factory;
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
   const CMPIEnumeration* systems = nullptr;
   if (!askForNames(operation, nameSpace, computerSystemClass, "Create CMPIObjectPath failed for ComputerSystem.",
                    systems)) {
-    return false;
+    return 1;
   }
   while (hasNext(systems, &operation.status)) {
     const CMPIObjectPath* system = nextPath(systems, &operation.status);
     const std::string name = keyText(system, "Name", &operation.status);
     std::vector<CMPIObjectPath*> endpoints;
     if (!fetchEndpoints(operation, factory, ref, endpoints)) {
-      return complain(operation,
-                      "***Can't get DNS Client ObjectPaths.                 Exiting EnumerateInstanceNames***");
+      return failBuilder(operation,
+                         "***Can't get DNS Client ObjectPaths.                 Exiting EnumerateInstanceNames***");
     }
     for (CMPIObjectPath* endpoint : counted16(endpoints)) {
-      if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Client")) return false;
+      if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Client")) return 1;
       if (name.find(keyText(endpoint, "SystemName", &operation.status)) == std::string::npos) continue;
       setNameSpace(endpoint, nameSpace);
       CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsHostedAccessPointClass, &operation.status);
       if (isMissing(operation, path,
                     "Create CMPIObjectPath failed for                     dnsHostedAccessPointClass.")) {
-        return false;
+        return 1;
       }
       CMPIInstance* instance = newInstance(broker, path, &operation.status);
       setPropertyFilter(instance, properties, {"Antecedent", "Dependent"});
@@ -52,13 +53,13 @@ static bool DNSHostedAccessPointCMPIInstances(const CMPIContext* context, const 
     }
   }
   markExit(operation);
-  return true;
+  return 0;
 }
 
 // Delivers each path at once: a failure further on leaves what went out, and the result open.
 static CMPIStatus DNSHostedAccessPoint_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                          const CMPIResult* result, const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSHostAccessPoint, context, result, ref);
   DNSClientObjFactory factory;
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
   const CMPIEnumeration* systems = nullptr;
@@ -91,7 +92,7 @@ static CMPIStatus DNSHostedAccessPoint_EnumInstanceNames(CMPIInstanceMI*, const 
 static CMPIStatus DNSHostedAccessPoint_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                      const CMPIResult* result, const CMPIObjectPath* ref,
                                                      const char** properties) {
-  const Operation operation = ZV_OPERATION(context, result, ref);
+  const Operation operation = ZV_OPERATION(loggerDNSHostAccessPoint, context, result, ref);
   returnBuilt(operation, DNSHostedAccessPointCMPIInstances, properties);
   return end(operation);
 }
@@ -99,7 +100,7 @@ static CMPIStatus DNSHostedAccessPoint_EnumInstances(CMPIInstanceMI*, const CMPI
 static CMPIStatus DNSHostedAccessPoint_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
                                                    const CMPIResult* result, const CMPIObjectPath* ref,
                                                    const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSHostAccessPoint, context, result, ref);
   returnEqualBuilt(operation, DNSHostedAccessPointCMPIInstances, properties);
   return end(operation);
 }
@@ -114,7 +115,7 @@ static CMPIStatus DNSHostedAccessPoint_Associators(CMPIAssociationMI*, const CMP
                                                    const CMPIResult* result, const CMPIObjectPath* ref,
                                                    const char* assocClass, const char* resultClass, const char*,
                                                    const char*, const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSHostAccessPoint, context, result, ref);
   DNSClientObjFactory factory;
   const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsHostedAccessPointClass),
                                       resultClass, "Object Path is NULL in Associators.");
@@ -151,7 +152,7 @@ static CMPIStatus DNSHostedAccessPoint_AssociatorNames(CMPIAssociationMI*, const
                                                        const CMPIResult* result, const CMPIObjectPath* ref,
                                                        const char* assocClass, const char* resultClass, const char*,
                                                        const char*) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSHostAccessPoint, context, result, ref);
   DNSClientObjFactory factory;
   const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsHostedAccessPointClass),
                                       resultClass, "Object Path is NULL in AssociatorNames.");
@@ -218,13 +219,15 @@ static CMPIStatus refer(Operation operation, const char* noFarEnd, Deliver deliv
 static CMPIStatus DNSHostedAccessPoint_References(CMPIAssociationMI*, const CMPIContext* context,
                                                   const CMPIResult* result, const CMPIObjectPath* ref, const char*,
                                                   const char*, const char**) {
-  return refer(ZV_OPERATION(context, result, ref), "Object Path is NULL in References.", deliverInstance);
+  return refer(ZV_OPERATION(loggerDNSHostAccessPoint, context, result, ref), "Object Path is NULL in References.",
+               deliverInstance);
 }
 
 static CMPIStatus DNSHostedAccessPoint_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
                                                       const CMPIResult* result, const CMPIObjectPath* ref, const char*,
                                                       const char*) {
-  return refer(ZV_OPERATION(context, result, ref), "Object Path is NULL in ReferenceNames.", deliverPathOnThisHost);
+  return refer(ZV_OPERATION(loggerDNSHostAccessPoint, context, result, ref), "Object Path is NULL in ReferenceNames.",
+               deliverPathOnThisHost);
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSHostedAccessPoint)

@@ -11,7 +11,7 @@
 
 namespace ZV {
 
-static const std::string logCategory = "Zorvagent.DNSOrderedComponentProvider";
+static const std::string loggerDNSOrderedComponent = "Zorvagent.DNSOrderedComponentProvider";
 static const char* const dnsSettingDataClass = "ZORVA_DNSSettingData";
 static const char* const dnsOrderedComponentClass = "ZORVA_DNSOrderedComponent";
 static const char* const ipAssignmentSettingDataClass = "ZORVA_IPAssignmentSettingData";
@@ -39,22 +39,22 @@ bool requireTarget(const Operation& operation, const std::string& instanceID, st
 
 }  // namespace
 
-static bool DNSOrderedComponentCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
-                                             const char** properties, std::vector<CMPIInstance*>& instances) {
-  Operation operation = ZV_UNMARKED_OPERATION(context, nullptr, ref);
-  const FlowLog flow(logCategory, ZV_HERE, " ref=", ref, " properties=", properties, " ctx=", context,
+static unsigned short DNSOrderedComponentCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
+                                                       const char** properties, std::vector<CMPIInstance*>& instances) {
+  Operation operation = ZV_UNMARKED_OPERATION(loggerDNSOrderedComponent, context, nullptr, ref);
+  const FlowLog flow(loggerDNSOrderedComponent, ZV_HERE, " ref=", ref, " properties=", properties, " ctx=", context,
                      " instances=", &instances);
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
   const CMPIEnumeration* assignments = nullptr;
   if (!askForNames(operation, nameSpace, ipAssignmentSettingDataClass,
                    "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.", assignments)) {
-    return false;
+    return 1;
   }
   std::vector<CMPIObjectPath*> settings;
   if (getAllDNSSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
     complain(operation, "getAllDNSSettingDataCMPIObjectPaths failed");
     markExit(operation);
-    return false;
+    return 1;
   }
   while (hasNext(assignments, &operation.status)) {
     const CMPIObjectPath* assignment = nextPath(assignments, &operation.status);
@@ -62,13 +62,13 @@ static bool DNSOrderedComponentCMPIInstances(const CMPIContext* context, const C
     const std::string target = instanceID.substr(0, instanceID.rfind('%'));  // without a "%" the whole text
     logValue(operation, "target", target);
     for (CMPIObjectPath* setting : counted16(settings)) {
-      if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return false;
+      if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return 1;
       if (keyText(setting, "InstanceID", &operation.status) != target) continue;
       setNameSpaceAndHost(setting, nameSpace);
       CMPIInstance* instance = nullptr;
       if (!newBuilt(operation, nameSpace, dnsOrderedComponentClass,
                     "Create CMPIObjectPath failed for                         DNSOrderedComponent.", instance)) {
-        return false;
+        return 1;
       }
       if (!isGood(instance)) continue;
       setPropertyFilter(instance, properties, {"GroupComponent", "PartComponent"});
@@ -77,13 +77,13 @@ static bool DNSOrderedComponentCMPIInstances(const CMPIContext* context, const C
     }
   }
   flow.exit();
-  return true;
+  return 0;
 }
 
 // The paths of what is built: nothing goes out before all is built.
 static CMPIStatus DNSOrderedComponent_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                         const CMPIResult* result, const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSOrderedComponent, context, result, ref);
   returnPathsOfBuilt(operation, DNSOrderedComponentCMPIInstances);
   return end(operation);
 }
@@ -91,14 +91,14 @@ static CMPIStatus DNSOrderedComponent_EnumInstanceNames(CMPIInstanceMI*, const C
 static CMPIStatus DNSOrderedComponent_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                     const CMPIResult* result, const CMPIObjectPath* ref,
                                                     const char** properties) {
-  const Operation operation = ZV_OPERATION(context, result, ref);
+  const Operation operation = ZV_OPERATION(loggerDNSOrderedComponent, context, result, ref);
   returnBuilt(operation, DNSOrderedComponentCMPIInstances, properties);
   return end(operation);
 }
 
 static CMPIStatus DNSOrderedComponent_GetInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                                   const CMPIObjectPath* ref, const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSOrderedComponent, context, result, ref);
   returnEqualBuilt(operation, DNSOrderedComponentCMPIInstances, properties);
   return end(operation);
 }
@@ -107,7 +107,7 @@ static CMPIStatus DNSOrderedComponent_Associators(CMPIAssociationMI*, const CMPI
                                                   const CMPIResult* result, const CMPIObjectPath* ref,
                                                   const char* assocClass, const char* resultClass, const char*,
                                                   const char*, const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSOrderedComponent, context, result, ref);
   DNSClientObjFactory factory;
   const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsOrderedComponentClass),
                                       resultClass, "Object Path is NULL in Associators.");
@@ -147,7 +147,7 @@ static CMPIStatus DNSOrderedComponent_AssociatorNames(CMPIAssociationMI*, const 
                                                       const CMPIResult* result, const CMPIObjectPath* ref,
                                                       const char* assocClass, const char* resultClass, const char*,
                                                       const char*) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSOrderedComponent, context, result, ref);
   DNSClientObjFactory factory;
   const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsOrderedComponentClass),
                                       resultClass, "Object Path is NULL in Associators.");
@@ -231,13 +231,13 @@ static CMPIStatus refer(Operation operation, PartOf partOf, Deliver deliver) {
 static CMPIStatus DNSOrderedComponent_References(CMPIAssociationMI*, const CMPIContext* context,
                                                  const CMPIResult* result, const CMPIObjectPath* ref, const char*,
                                                  const char*, const char**) {
-  return refer(ZV_OPERATION(context, result, ref), farEndOf, deliverInstance);
+  return refer(ZV_OPERATION(loggerDNSOrderedComponent, context, result, ref), farEndOf, deliverInstance);
 }
 
 static CMPIStatus DNSOrderedComponent_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
                                                      const CMPIResult* result, const CMPIObjectPath* ref, const char*,
                                                      const char*) {
-  return refer(ZV_OPERATION(context, result, ref), sourceOf, deliverPath);
+  return refer(ZV_OPERATION(loggerDNSOrderedComponent, context, result, ref), sourceOf, deliverPath);
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSOrderedComponent)

@@ -7,33 +7,34 @@
 
 namespace ZV {
 
-static const std::string logCategory = "Zorvagent.DNSRemoteAccessAvailableToElementProvider";
+static const std::string loggerDNSRemoteAccess = "Zorvagent.DNSRemoteAccessAvailableToElementProvider";
 static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
 static const char* const remoteServiceAccessPointClass = "ZORVA_RemoteServiceAccessPoint";
 static const char* const remoteAccessAvailableToElementClass = "ZORVA_RemoteAccessAvailableToElement";
 
-static bool RemoteAccessAvailableToElementCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
-                                                        const char** properties,
-                                                        std::vector<CMPIInstance*>& instances) {
-  Operation operation = ZV_UNMARKED_OPERATION(context, nullptr, ref);
-  const FlowLog flow(logCategory, ZV_HERE, " ref=", ref, " properties=", properties, " instances=", &instances);
+static unsigned short RemoteAccessAvailableToElementCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
+                                                                  const char** properties,
+                                                                  std::vector<CMPIInstance*>& instances) {
+  Operation operation = ZV_UNMARKED_OPERATION(loggerDNSRemoteAccess, context, nullptr, ref);
+  const FlowLog flow(loggerDNSRemoteAccess, ZV_HERE, " ref=", ref, " properties=", properties,
+                     " instances=", &instances);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> servers;
   if (!fetchServers(operation, factory, ref, servers)) {
-    return complain(operation, "***Can't get DNS Server ObjectPaths.             Exiting EnumerateInstanceNames***");
+    return failBuilder(operation, "***Can't get DNS Server ObjectPaths.             Exiting EnumerateInstanceNames***");
   }
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
   for (CMPIObjectPath* server : counted16(servers)) {
-    if (isMissing(operation, server, "CMPIObjectPath is NULL for DNS Server")) return false;
+    if (isMissing(operation, server, "CMPIObjectPath is NULL for DNS Server")) return 1;
     std::vector<CMPIObjectPath*> clients;  // made afresh for every server
     if (!fetchEndpoints(operation, factory, ref, clients)) {
-      return complain(operation,
-                      "***Can't get ObjectPaths for DNSClient.                 Exiting EnumerateInstanceNames***");
+      return failBuilder(operation,
+                         "***Can't get ObjectPaths for DNSClient.                 Exiting EnumerateInstanceNames***");
     }
     for (const CMPIObjectPath* client : counted16(clients)) {
-      if (isMissing(operation, client, "CMPIObjectPath is NULL for DNSClient")) return false;
+      if (isMissing(operation, client, "CMPIObjectPath is NULL for DNSClient")) return 1;
       CMPIObjectPath* path = newHostPath(broker, nameSpace, remoteAccessAvailableToElementClass, nullptr);
-      if (isMissing(operation, path, "Create CMPIObjectPath failed for RemoteAccessAvailableToElement.")) return false;
+      if (isMissing(operation, path, "Create CMPIObjectPath failed for RemoteAccessAvailableToElement.")) return 1;
       CMPIInstance* instance = newInstance(broker, path, nullptr);
       instances.push_back(instance);  // good or not
       if (!isGood(instance)) continue;
@@ -43,7 +44,7 @@ static bool RemoteAccessAvailableToElementCMPIInstances(const CMPIContext* conte
     }
   }
   flow.exit();
-  return true;
+  return 0;
 }
 
 // The enumerations alone are done after they are marked as left.
@@ -57,7 +58,7 @@ static CMPIStatus endEnumeration(const Operation& operation, const Place& place 
 static CMPIStatus DNSRemoteAccessAvailableToElement_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                                       const CMPIResult* result,
                                                                       const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSRemoteAccess, context, result, ref);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> servers;
   if (!fetchServers(operation, factory, ref, servers)) {
@@ -88,7 +89,7 @@ static CMPIStatus DNSRemoteAccessAvailableToElement_EnumInstanceNames(CMPIInstan
 static CMPIStatus DNSRemoteAccessAvailableToElement_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                                   const CMPIResult* result, const CMPIObjectPath* ref,
                                                                   const char** properties) {
-  const Operation operation = ZV_OPERATION(context, result, ref);
+  const Operation operation = ZV_OPERATION(loggerDNSRemoteAccess, context, result, ref);
   returnBuilt(operation, RemoteAccessAvailableToElementCMPIInstances, properties);
   return endEnumeration(operation);
 }
@@ -96,7 +97,7 @@ static CMPIStatus DNSRemoteAccessAvailableToElement_EnumInstances(CMPIInstanceMI
 static CMPIStatus DNSRemoteAccessAvailableToElement_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
                                                                 const CMPIResult* result, const CMPIObjectPath* ref,
                                                                 const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSRemoteAccess, context, result, ref);
   returnEqualBuilt(operation, RemoteAccessAvailableToElementCMPIInstances, properties);
   return end(operation);
 }
@@ -108,7 +109,7 @@ static CMPIStatus DNSRemoteAccessAvailableToElement_Associators(CMPIAssociationM
                                                                 const CMPIResult* result, const CMPIObjectPath* ref,
                                                                 const char* assocClass, const char* resultClass,
                                                                 const char*, const char*, const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSRemoteAccess, context, result, ref);
   DNSClientObjFactory factory;
   const FarEnd farEnd =
       resolveFarEnd(operation, factory, associationOr(assocClass, remoteAccessAvailableToElementClass), resultClass,
@@ -137,7 +138,7 @@ static CMPIStatus DNSRemoteAccessAvailableToElement_AssociatorNames(CMPIAssociat
                                                                     const CMPIResult* result, const CMPIObjectPath* ref,
                                                                     const char* assocClass, const char* resultClass,
                                                                     const char*, const char*) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSRemoteAccess, context, result, ref);
   DNSClientObjFactory factory;
   const FarEnd farEnd =
       resolveFarEnd(operation, factory, associationOr(assocClass, remoteAccessAvailableToElementClass), resultClass,
@@ -176,7 +177,7 @@ static void setEnds(const CMPIInstance* reference, const FarEnd& farEnd, const C
 static CMPIStatus DNSRemoteAccessAvailableToElement_References(CMPIAssociationMI*, const CMPIContext* context,
                                                                const CMPIResult* result, const CMPIObjectPath* ref,
                                                                const char*, const char*, const char**) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSRemoteAccess, context, result, ref);
   DNSClientObjFactory factory;
   const auto [farEnd, nameSpace, association] =
       resolveReferences(operation, factory, remoteAccessAvailableToElementClass, newHostPath,
@@ -205,7 +206,7 @@ static CMPIStatus DNSRemoteAccessAvailableToElement_References(CMPIAssociationMI
 static CMPIStatus DNSRemoteAccessAvailableToElement_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
                                                                    const CMPIResult* result, const CMPIObjectPath* ref,
                                                                    const char*, const char*) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSRemoteAccess, context, result, ref);
   DNSClientObjFactory factory;
   const auto [farEnd, nameSpace, association] =
       resolveReferences(operation, factory, remoteAccessAvailableToElementClass, newHostPath,

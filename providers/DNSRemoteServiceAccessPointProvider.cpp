@@ -5,14 +5,14 @@
 
 namespace ZV {
 
-static const std::string logCategory = "Zorvagent.DNSRemoteServiceAccessPointProvider";
+static const std::string loggerDNSRemoteSAP = "Zorvagent.DNSRemoteServiceAccessPointProvider";
 
 // A failure below leaves the result open: neither done nor marked as left, with the status as the broker's calls left
 // it.
 
 static CMPIStatus DNSRemoteServiceAccessPoint_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                                 const CMPIResult* result, const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSRemoteSAP, context, result, ref);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> paths;
   if (!fetchServers(operation, factory, ref, paths)) return fail(operation, "getAllDNSServerCMPIObjPaths Failed");
@@ -23,7 +23,7 @@ static CMPIStatus DNSRemoteServiceAccessPoint_EnumInstanceNames(CMPIInstanceMI*,
 static CMPIStatus DNSRemoteServiceAccessPoint_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                             const CMPIResult* result, const CMPIObjectPath* ref,
                                                             const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSRemoteSAP, context, result, ref);
   DNSClientObjFactory factory;
   std::vector<CMPIInstance*> instances;
   if (!fetchServers(operation, factory, ref, properties, instances)) {
@@ -36,7 +36,7 @@ static CMPIStatus DNSRemoteServiceAccessPoint_EnumInstances(CMPIInstanceMI*, con
 static CMPIStatus DNSRemoteServiceAccessPoint_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
                                                           const CMPIResult* result, const CMPIObjectPath* ref,
                                                           const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSRemoteSAP, context, result, ref);
   if (keyCountOf(ref, &operation.status) == 0) {
     complain(operation, "At least one key should be passed");
     return end(operation);

@@ -11,7 +11,7 @@
 
 namespace ZV {
 
-static const std::string logCategory = "Zorvagent.DNSSAPSAPDependencyProvider";
+static const std::string loggerDNSSAPDependency = "Zorvagent.DNSSAPSAPDependencyProvider";
 static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
 static const char* const dnsSAPSAPDependencyClass = "ZORVA_DNSSAPSAPDependency";
 static const char* const ipInterfaceClass = "ZORVA_IPProtocolEndpoint";
@@ -39,26 +39,26 @@ bool findEndpoint(Operation& operation, DNSClientObjFactory& factory, const CMPI
 
 }  // namespace
 
-static bool DNSSAPSAPDependencyCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
-                                             const char** properties, std::vector<CMPIInstance*>& instances) {
-  Operation operation = ZV_OPERATION(context, nullptr, ref);
+static unsigned short DNSSAPSAPDependencyCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
+                                                       const char** properties, std::vector<CMPIInstance*>& instances) {
+  Operation operation = ZV_OPERATION(loggerDNSSAPDependency, context, nullptr, ref);
   DNSClientObjFactory factory;
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
   const CMPIEnumeration* ipEndpoints = nullptr;
   if (!askForNames(operation, nameSpace, ipInterfaceClass, "Create CMPIObjectPath failed for IpInterfaceClass.",
                    ipEndpoints)) {
-    return false;
+    return 1;
   }
   while (hasNext(ipEndpoints, &operation.status)) {
     const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &operation.status);
     CMPIInstance* endpoint = nullptr;
-    if (!findEndpoint(operation, factory, ipEndpoint, false, properties, endpoint)) return false;
+    if (!findEndpoint(operation, factory, ipEndpoint, false, properties, endpoint)) return 1;
     if (!isGood(endpoint)) continue;
     CMPIObjectPath* endpointPath = objectPathOf(endpoint, &operation.status);
-    if (isMissing(operation, endpointPath, "CMPIObjectPath is NULL for DNS Client")) return false;
+    if (isMissing(operation, endpointPath, "CMPIObjectPath is NULL for DNS Client")) return 1;
     setNameSpaceAndHost(endpointPath, nameSpace);
     CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsSAPSAPDependencyClass, &operation.status);
-    if (isMissing(operation, path, "Create CMPIObjectPath failed for \t\t\t\tDNSSAPSAPDependency.")) return false;
+    if (isMissing(operation, path, "Create CMPIObjectPath failed for \t\t\t\tDNSSAPSAPDependency.")) return 1;
     CMPIInstance* instance = newInstance(broker, path, &operation.status);
     if (!isGood(instance)) continue;
     setPropertyFilter(instance, properties, {"Antecedent", "Dependent"});
@@ -66,13 +66,13 @@ static bool DNSSAPSAPDependencyCMPIInstances(const CMPIContext* context, const C
     instances.push_back(instance);
   }
   markExit(operation);
-  return true;
+  return 0;
 }
 
 // Delivers each path at once: a failure further on leaves what went out, and the result open.
 static CMPIStatus DNSSAPSAPDependency_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                         const CMPIResult* result, const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSSAPDependency, context, result, ref);
   DNSClientObjFactory factory;
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
   const CMPIEnumeration* ipEndpoints = nullptr;
@@ -100,14 +100,14 @@ static CMPIStatus DNSSAPSAPDependency_EnumInstanceNames(CMPIInstanceMI*, const C
 static CMPIStatus DNSSAPSAPDependency_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
                                                     const CMPIResult* result, const CMPIObjectPath* ref,
                                                     const char** properties) {
-  const Operation operation = ZV_OPERATION(context, result, ref);
+  const Operation operation = ZV_OPERATION(loggerDNSSAPDependency, context, result, ref);
   returnBuilt(operation, DNSSAPSAPDependencyCMPIInstances, properties);
   return end(operation);
 }
 
 static CMPIStatus DNSSAPSAPDependency_GetInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                                   const CMPIObjectPath* ref, const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSSAPDependency, context, result, ref);
   returnEqualBuilt(operation, DNSSAPSAPDependencyCMPIInstances, properties);
   return end(operation);
 }
@@ -118,7 +118,7 @@ static CMPIStatus DNSSAPSAPDependency_Associators(CMPIAssociationMI*, const CMPI
                                                   const CMPIResult* result, const CMPIObjectPath* ref,
                                                   const char* assocClass, const char* resultClass, const char*,
                                                   const char*, const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSSAPDependency, context, result, ref);
   DNSClientObjFactory factory;
   const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsSAPSAPDependencyClass),
                                       resultClass, "Object Path is NULL in Associators.");
@@ -149,7 +149,7 @@ static CMPIStatus DNSSAPSAPDependency_AssociatorNames(CMPIAssociationMI*, const 
                                                       const CMPIResult* result, const CMPIObjectPath* ref,
                                                       const char* assocClass, const char* resultClass, const char*,
                                                       const char*) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSSAPDependency, context, result, ref);
   DNSClientObjFactory factory;
   const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsSAPSAPDependencyClass),
                                       resultClass, "Object Path is NULL in AssociatorNames.");
@@ -210,13 +210,15 @@ static CMPIStatus refer(Operation operation, const char* noFarEnd, Deliver deliv
 static CMPIStatus DNSSAPSAPDependency_References(CMPIAssociationMI*, const CMPIContext* context,
                                                  const CMPIResult* result, const CMPIObjectPath* ref, const char*,
                                                  const char*, const char**) {
-  return refer(ZV_OPERATION(context, result, ref), "Object Path is NULL in References.", deliverInstance);
+  return refer(ZV_OPERATION(loggerDNSSAPDependency, context, result, ref), "Object Path is NULL in References.",
+               deliverInstance);
 }
 
 static CMPIStatus DNSSAPSAPDependency_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
                                                      const CMPIResult* result, const CMPIObjectPath* ref, const char*,
                                                      const char*) {
-  return refer(ZV_OPERATION(context, result, ref), "Object Path is NULL in ReferenceNames.", deliverPathOnThisHost);
+  return refer(ZV_OPERATION(loggerDNSSAPDependency, context, result, ref), "Object Path is NULL in ReferenceNames.",
+               deliverPathOnThisHost);
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSSAPSAPDependency)

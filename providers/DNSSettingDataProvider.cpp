@@ -6,14 +6,14 @@
 
 namespace ZV {
 
-static const std::string logCategory = "Zorvagent.DNSSettingDataProvider";
+static const std::string loggerDNSSettingDataProv = "Zorvagent.DNSSettingDataProvider";
 
 // A failure below leaves the result open: neither done nor marked as left, with the status as the broker's calls left
 // it.
 
 static CMPIStatus DNSSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                    const CMPIResult* result, const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSSettingDataProv, context, result, ref);
   std::vector<CMPIObjectPath*> paths;
   if (getAllDNSSettingDataCMPIObjectPaths(broker, ref, &paths, &operation.status) != 0) {
     return fail(operation, "getAllDNSSettingDataCMPIInstances Failed");
@@ -24,7 +24,7 @@ static CMPIStatus DNSSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPICo
 
 static CMPIStatus DNSSettingData_EnumInstances(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                                const CMPIObjectPath* ref, const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSSettingDataProv, context, result, ref);
   std::vector<CMPIInstance*> instances;
   if (getAllDNSSettingDataCMPIInstances(broker, ref, properties, &instances, &operation.status) != 0) {
     return fail(operation, "getAllDNSSettingDataCMPIInstances Failed");
@@ -35,7 +35,7 @@ static CMPIStatus DNSSettingData_EnumInstances(CMPIInstanceMI*, const CMPIContex
 
 static CMPIStatus DNSSettingData_GetInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                              const CMPIObjectPath* ref, const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSSettingDataProv, context, result, ref);
   CMPIInstance* instance = nullptr;
   if (getOneDNSSettingDataCMPIInstance(broker, ref, properties, &instance, &operation.status) != 0) {
     return fail(operation, "getOneDNSSettingDataCMPIInstance Failed");
@@ -47,7 +47,7 @@ static CMPIStatus DNSSettingData_GetInstance(CMPIInstanceMI*, const CMPIContext*
 static CMPIStatus DNSSettingData_ModifyInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                                 const CMPIObjectPath* ref, const CMPIInstance* instance,
                                                 const char** properties) {
-  Operation operation = ZV_OPERATION(context, result, ref);
+  Operation operation = ZV_OPERATION(loggerDNSSettingDataProv, context, result, ref);
   const unsigned int rc = modifyDNSSettingDataCMPIInstance(broker, ref, properties, instance, &operation.status);
   if (rc != CMPI_RC_OK) {
     complain(operation, "modifyDNSSettingDataCMPIInstance Failed");

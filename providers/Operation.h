@@ -21,12 +21,11 @@ struct Operation {
   CMPIStatus status;
 };
 
-// The operation of the function that says so, with the broker of its source and the source's logCategory. The first
-// marks the entry; the second is for functions that write an entry line of their own.
-#define ZV_OPERATION(context, result, ref) (::ZV::enter(ZV_UNMARKED_OPERATION(context, result, ref)))
-#define ZV_UNMARKED_OPERATION(context, result, ref)                                                     \
-  (::ZV::Operation{::ZV::broker, logCategory, static_cast<const char*>(__func__), context, result, ref, \
-                   ::ZV::kStatusOk})
+// The operation of the function that says so, with the broker of its source. The first marks the entry; the second is
+// for functions that write an entry line of their own.
+#define ZV_OPERATION(logger, context, result, ref) (::ZV::enter(ZV_UNMARKED_OPERATION(logger, context, result, ref)))
+#define ZV_UNMARKED_OPERATION(logger, context, result, ref) \
+  (::ZV::Operation{::ZV::broker, logger, static_cast<const char*>(__func__), context, result, ref, ::ZV::kStatusOk})
 
 // Each line has the operation's name and the place of the statement that calls.
 
