@@ -237,11 +237,16 @@ void CommandLine::addPropertyOption(CLI::App* subcommand) {
 }
 
 void CommandLine::addOverviews() {
-  add(app_, "show", "The endpoints, servers and settings of this host at a glance", showHost);
+  const auto all = [this](CLI::App* subcommand, const char* description) {
+    subcommand->add_flag("--all", invocation_.arguments.all, description);
+  };
+  constexpr const char* kCountsAll = "Count the associations of a host with very many interfaces, too; takes long";
+  all(add(app_, "show", "The endpoints, servers and settings of this host at a glance", showHost), kCountsAll);
   add(app_, "tree", "The agent's instrumentation tree", showTree);
-  add(app_, "classes", "The classes with their providers and instance counts", listClasses);
+  all(add(app_, "classes", "The classes with their providers and instance counts", listClasses), kCountsAll);
   CLI::App* graph = add(app_, "graph", "The objects and how they are associated", showGraph);
   graph->add_option("PATH", invocation_.arguments.target, "Begin at this object; without it, all are shown");
+  all(graph, "Follow all objects of a host with very many interfaces, too; takes long");
 }
 
 void CommandLine::addReading() {
@@ -427,7 +432,12 @@ Telling wrongUsage(const CLI::App& app, const CLI::ParseError& error) {
   while (!at->get_subcommands().empty()) at = at->get_subcommands().back();
   const std::string call = "zorvactl" + (at == &app ? std::string() : " " + callOf(*at));
   if (at->get_require_subcommand_min() == 0 || dynamic_cast<const CLI::RequiredError*>(&error) == nullptr) {
-    return {printable(error.what()), true, call + " --help shows the usage"};
+    const std::vector<std::string> unknown = app.remaining(true);
+    const bool isLikeAnOption = std::any_of(unknown.begin(), unknown.end(), [](const std::string& word) {
+      return word.size() > 1 && word.starts_with('-');
+    });
+    return {printable(error.what()), true,
+            (isLikeAnOption ? "a value that begins with '-' goes after --; " : "") + call + " --help shows the usage"};
   }
   std::vector<std::string> names;
   for (const CLI::App* each : at->get_subcommands([](const CLI::App*) { return true; })) {

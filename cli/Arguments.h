@@ -33,6 +33,7 @@ struct Arguments {
   std::string resultRole;
 
   std::vector<std::string> properties;  ///< of those wanted; empty: all
+  bool all = false;                     ///< whatever time it takes
   bool only = false;
   bool force = false;
   bool dryRun = false;

@@ -4,6 +4,7 @@
 #include <deque>
 #include <set>
 #include <unordered_map>
+#include <unordered_set>
 
 #include "cli/Failure.h"
 #include "cli/HostView.h"
@@ -26,37 +27,61 @@ std::string identity(const broker::ObjectPath& path) {
   return shortPathText(plain);
 }
 
+// A host with up to this many objects is walked whole.
+constexpr std::size_t kManyObjects = 1000;
+// On a larger one this many objects are asked, times the number of all; two at least.
+constexpr std::size_t kMostWork = 100'000;
+
 class Walk {
  public:
-  explicit Walk(Session& session) : session_(session) {}
+  Walk(Session& session, Progress& progress, const std::vector<broker::ObjectPath>& roots, bool followsAll)
+      : session_(session), progress_(progress), followsAll_(followsAll), atLeast_(roots.size()) {
+    for (const broker::ObjectPath& root : roots) visit(root);
+  }
 
+  Graph take() {
+    graph_.isWhole = problems_.empty() && graph_.notFollowed == 0;
+    for (const Problem& problem : problems_) tellWarning("associations of " + problemText(problem));
+    return std::move(graph_);
+  }
+
+ private:
   void visit(const broker::ObjectPath& root) {
+    if (graph_.notFollowed != 0) {  // it is not walked to its end
+      graph_.notFollowed += places_.contains(identity(root)) ? 0 : 1;
+      return;
+    }
     placeOf(root);
     while (!open_.empty()) {
+      if (!mayFollow()) {
+        graph_.notFollowed = open_.size();
+        return;
+      }
       const std::size_t object = open_.front();
       open_.pop_front();
       follow(object);
     }
   }
 
-  Graph take() {
-    graph_.isWhole = problems_.empty();
-    for (const Problem& problem : problems_) tellWarning("associations of " + problemText(problem));
-    return std::move(graph_);
+  bool isLarge() const { return std::max(graph_.objects.size(), atLeast_) > kManyObjects; }
+
+  bool mayFollow() const {
+    const std::size_t all = std::max(graph_.objects.size(), atLeast_);
+    return followsAll_ || !isLarge() || followed_ < 2 || followed_ * all < kMostWork;
   }
 
- private:
   std::size_t placeOf(const broker::ObjectPath& path) {
     const auto [known, isNew] = places_.try_emplace(identity(path), graph_.objects.size());
     if (isNew) {
-      graph_.objects.push_back({path, problemOf(path)});
+      graph_.objects.push_back({path, problemOf(path, known->first)});
       if (graph_.objects.back().problem.empty()) open_.push_back(known->second);
     }
     return known->second;
   }
 
-  std::string problemOf(const broker::ObjectPath& path) {
+  std::string problemOf(const broker::ObjectPath& path, const std::string& name) {
     if (path.keys.empty()) return "its provider gives this end without keys, by design";
+    if (isLarge() && isListed(path.className, name)) return {};
     broker::Instance instance;
     broker::Selection keysOnly;
     keysOnly.propertyList.emplace();
@@ -64,8 +89,21 @@ class Walk {
     return status.ok() ? std::string() : operationFailure("GetInstance", status).what();
   }
 
+  bool isListed(const std::string& className, const std::string& name) {
+    const auto [names, isNew] = listed_.try_emplace(className);
+    if (isNew) {
+      session_.cim().enumerateInstanceNames({}, className, [&names = names->second](const broker::ObjectPath& each) {
+        names.insert(identity(each));
+        return true;
+      });
+    }
+    return names->second.contains(name);
+  }
+
   void follow(std::size_t object) {
     const broker::ObjectPath path = graph_.objects[object].path;
+    progress_.step("following the associations of " + objectLabel(path));
+    ++followed_;
     std::vector<broker::Instance> found;
     const broker::Status status = session_.cim().references(path, {}, {}, [&found](const broker::Instance& each) {
       found.push_back(each);
@@ -73,6 +111,7 @@ class Walk {
     });
     // Results may have come before a failure; what is missing then is told.
     if (!status.ok()) addProblem(problems_, objectLabel(path), statusText(status));
+    atLeast_ = std::max(atLeast_, found.size());
     for (const broker::Instance& association : found) add(association);
   }
 
@@ -91,9 +130,14 @@ class Walk {
   }
 
   Session& session_;
+  Progress& progress_;
+  const bool followsAll_;
+  std::size_t atLeast_;  // at least so many objects there are
+  std::size_t followed_ = 0;
   Graph graph_;
   std::vector<Problem> problems_;
   std::unordered_map<std::string, std::size_t> places_;
+  std::unordered_map<std::string, std::unordered_set<std::string>> listed_;  // by class
   std::set<std::string> known_;
   std::deque<std::size_t> open_;
 };
@@ -218,13 +262,11 @@ std::string danglingLine(const GraphAssociation& association, const GraphEnd& en
 
 }  // namespace
 
-Graph walkGraph(Session& session, const std::vector<broker::ObjectPath>& roots) {
-  Walk walk(session);
-  for (const broker::ObjectPath& root : roots) walk.visit(root);
-  return walk.take();
+Graph walkGraph(Session& session, Progress& progress, const std::vector<broker::ObjectPath>& roots, bool followsAll) {
+  return Walk(session, progress, roots, followsAll).take();
 }
 
-std::vector<broker::ObjectPath> allObjects(Session& session) {
+std::vector<broker::ObjectPath> allObjects(Session& session, Progress& progress) {
   const Session::Quiet quiet(session);
   std::vector<broker::ObjectPath> systems;
   std::vector<broker::ObjectPath> others;
@@ -233,6 +275,7 @@ std::vector<broker::ObjectPath> allObjects(Session& session) {
   for (const broker::ProviderEntry& entry : session.cim().served()) {
     const schema::Class& declared = session.classNamed(entry.className);
     if (declared.isAssociation()) continue;
+    progress.step("reading the names of " + entry.className);
     std::vector<broker::ObjectPath>& paths = declared.isA("CIM_System") ? systems : others;
     const broker::Status status =
         session.cim().enumerateInstanceNames({}, entry.className, [&](const broker::ObjectPath& path) {

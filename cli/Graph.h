@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "broker/Value.h"
+#include "cli/Progress.h"
 #include "cli/Session.h"
 
 // The objects and associations that a CIM client can reach, found by walking the CIM operations alone.
@@ -32,16 +33,20 @@ struct GraphObject {
 struct Graph {
   std::vector<GraphObject> objects;  ///< in the order in which they were found
   std::vector<GraphAssociation> associations;
-  bool isWhole = true;  ///< false: some object's associations could not be asked for
+  bool isWhole = true;          ///< false: some object's associations could not be asked for, or were not
+  std::size_t notFollowed = 0;  ///< how many objects were not asked for their associations, as that would take too long
 };
 
 /// Walks from these objects along references to all that they lead to. Every object that a reference names is fetched
 /// once, to see whether it is there. Tells on stderr whose associations cannot be asked for.
-Graph walkGraph(Session& session, const std::vector<broker::ObjectPath>& roots);
+///
+/// To ask one object takes a time that grows with the number of all. Where they are very many, only the first few are
+/// asked, unless `followsAll`, and an object that its class lists counts as there.
+Graph walkGraph(Session& session, Progress& progress, const std::vector<broker::ObjectPath>& roots, bool followsAll);
 
 /// The names of all instances of all classes that are no associations, computer systems first. A class whose provider
 /// cannot be asked is passed over with a warning; throws Failure where that is so of all.
-std::vector<broker::ObjectPath> allObjects(Session& session);
+std::vector<broker::ObjectPath> allObjects(Session& session, Progress& progress);
 
 /// A line for each association with an end that cannot be fetched: the association, the role, the path and why.
 std::vector<std::string> danglingReferences(const Graph& graph);

@@ -71,6 +71,14 @@ void writeSvg(const std::string& dot) {
   }
 }
 
+Graph graphOf(Session& session, const Arguments& arguments) {
+  Progress progress;
+  const std::vector<broker::ObjectPath> roots =
+      arguments.target.empty() ? allObjects(session, progress)
+                               : std::vector<broker::ObjectPath>{resolvePath(session, arguments.target)};
+  return walkGraph(session, progress, roots, arguments.all);
+}
+
 }  // namespace
 
 void showGraph(const Arguments& arguments) {
@@ -78,10 +86,12 @@ void showGraph(const Arguments& arguments) {
                 "graph");
   Session session(arguments);
   const Session::Quiet quiet(session);
-  const std::vector<broker::ObjectPath> roots =
-      arguments.target.empty() ? allObjects(session)
-                               : std::vector<broker::ObjectPath>{resolvePath(session, arguments.target)};
-  const Graph graph = walkGraph(session, roots);
+  const Graph graph = graphOf(session, arguments);
+  if (graph.notFollowed != 0) {
+    tellNote(
+        "of this many objects " + std::to_string(graph.notFollowed) +
+        " were not asked for their associations; graph PATH begins at one of them, --all asks all, which takes long");
+  }
   switch (arguments.output) {
     case OutputFormat::Json:
       write(graphJson(graph) + "\n");

@@ -3,6 +3,9 @@
 #include <sys/stat.h>
 
 #include <algorithm>
+#include <map>
+#include <string_view>
+#include <utility>
 
 #include "agent/Agent.h"
 #include "cli/Failure.h"
@@ -83,16 +86,27 @@ SettingSource sourceOf(const Origin& origin, zorvagent::PropertyNumber number, b
   return property != nullptr && property->overlaid ? SettingSource::Set : SettingSource::Host;
 }
 
-/// The configuration of that name, in the service processor or outside it.
-const zorvagent::Node* configuration(const zorvagent::TreeSnapshot& tree, const std::string& interface,
-                                     bool isServiceProcessor) {
-  for (const zorvagent::Node& node : tree.nodes()) {
-    const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
-    if (node.type() != zorvagent::NodeType::NetworkIPConfig || name == nullptr || *name != interface) continue;
-    if ((tree.parent(tree.parent(node)).description() == "BMC") == isServiceProcessor) return &node;
+/// The configurations of a tree by the names of their interfaces; of several with one name the first.
+class Configurations {
+ public:
+  explicit Configurations(const zorvagent::TreeSnapshot& tree) {
+    for (const zorvagent::Node& node : tree.nodes()) {
+      const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
+      if (node.type() != zorvagent::NodeType::NetworkIPConfig || name == nullptr) continue;
+      const bool isServiceProcessor = tree.parent(tree.parent(node)).description() == "BMC";
+      byName_.try_emplace({isServiceProcessor, *name}, &node);
+    }
   }
-  return nullptr;
-}
+
+  /// Null where there is none.
+  const zorvagent::Node* find(const std::string& interface, bool isServiceProcessor) const {
+    const auto found = byName_.find({isServiceProcessor, interface});
+    return found == byName_.end() ? nullptr : found->second;
+  }
+
+ private:
+  std::map<std::pair<bool, std::string_view>, const zorvagent::Node*> byName_;
+};
 
 template <std::size_t Size>
 void addSettings(std::vector<SettingRow>& rows, const SettingName (&names)[Size], const broker::Instance& instance,
@@ -130,15 +144,19 @@ void readServers(Session& session, HostView& view) {
 
 void readSettings(Session& session, HostView& view) {
   const auto tree = session.isRemote() ? nullptr : session.tree();
+  std::optional<Configurations> configurations;
+  if (tree != nullptr) configurations.emplace(*tree);
   for (const broker::Instance& instance : askedFor(session, kSettingClass, view)) {
     Origin origin{interfaceOfSetting(instance)};
     const bool isServiceProcessor = propertyText(instance, "InstanceID").starts_with("BMC%");
-    if (tree != nullptr) origin.node = configuration(*tree, origin.interface, isServiceProcessor);
+    if (configurations) origin.node = configurations->find(origin.interface, isServiceProcessor);
     addSettings(view.interfaceSettings, kInterfaceSettings, instance, tree == nullptr ? nullptr : &origin,
                 origin.interface);
   }
   Origin general{interfaceOfHostSettings(session).value_or("")};
-  if (tree != nullptr) general.node = configuration(*tree, general.interface, false);
+  std::stable_sort(view.interfaceSettings.begin(), view.interfaceSettings.end(),
+                   [](const SettingRow& a, const SettingRow& b) { return a.interface < b.interface; });
+  if (configurations) general.node = configurations->find(general.interface, false);
   for (const broker::Instance& instance : askedFor(session, kGeneralSettingClass, view)) {
     addSettings(view.hostSettings, kHostSettings, instance, tree == nullptr ? nullptr : &general, general.interface);
   }
@@ -190,30 +208,55 @@ std::vector<broker::Instance> instancesOf(Session& session, std::string_view cla
   return instances;
 }
 
-std::vector<ClassRow> readClassRows(Session& session) {
+namespace {
+
+// Above this number of instances of one class the associations are not counted without being asked for.
+constexpr std::uint64_t kManyInstances = 500;
+
+ClassRow emptyRow(const Session& session, const broker::ProviderEntry& entry) {
+  ClassRow row{entry.className, {}, {}, std::nullopt, {}};
+  if (!session.isRemote()) {
+    row.provider = entry.prefix;
+    row.library = entry.library;
+  }
+  return row;
+}
+
+void count(Session& session, ClassRow& row) {
+  std::uint64_t count = 0;
+  // Instances of subclasses are counted at their own class.
+  const broker::Status status = session.cim().enumerateInstanceNames({}, row.name, [&](const broker::ObjectPath& path) {
+    count += path.className == row.name ? 1 : 0;
+    return true;
+  });
+  if (status.ok()) {
+    row.count = count;
+  } else {
+    row.problem = statusText(status);
+  }
+}
+
+}  // namespace
+
+std::vector<ClassRow> readClassRows(Session& session, Progress& progress, bool countsAll) {
   const Session::Quiet quiet(session);
   std::vector<ClassRow> rows;
-  for (const broker::ProviderEntry& entry : session.cim().served()) {
-    ClassRow row{entry.className, {}, {}, std::nullopt, {}};
-    if (!session.isRemote()) {
-      row.provider = entry.prefix;
-      row.library = entry.library;
+  for (const broker::ProviderEntry& entry : session.cim().served()) rows.push_back(emptyRow(session, entry));
+  std::uint64_t most = 0;
+  for (const bool associations : {false, true}) {
+    if (associations && most > kManyInstances && !countsAll) break;
+    for (ClassRow& row : rows) {
+      if (session.classNamed(row.name).isAssociation() != associations) continue;
+      progress.step("counting " + row.name);
+      count(session, row);
+      most = std::max(most, row.count.value_or(0));
     }
-    std::uint64_t count = 0;
-    // Instances of subclasses are counted at their own class.
-    const broker::Status status =
-        session.cim().enumerateInstanceNames({}, entry.className, [&](const broker::ObjectPath& path) {
-          count += path.className == entry.className ? 1 : 0;
-          return true;
-        });
-    if (status.ok()) {
-      row.count = count;
-    } else {
-      row.problem = statusText(status);
-    }
-    rows.push_back(std::move(row));
   }
   return rows;
+}
+
+bool isUncounted(const std::vector<ClassRow>& rows) {
+  return std::any_of(rows.begin(), rows.end(), [](const ClassRow& row) { return !row.count && row.problem.empty(); });
 }
 
 bool HostView::couldAsk(std::string_view className) const {
@@ -245,17 +288,22 @@ std::string problemText(const Problem& problem) {
   return text + ": " + problem.what;
 }
 
-HostView readHostView(Session& session) {
+HostView readHostView(Session& session, Progress& progress, bool countsAll) {
   const Session::Quiet quiet(session);
   HostView view;
   view.hasSources = !session.isRemote();
+  progress.step("reading the endpoints");
   view.systemName = systemNameOf(session, view);
   for (const broker::Instance& instance : askedFor(session, kEndpointClass, view)) {
     view.endpoints.push_back(endpointRow(instance));
   }
+  std::stable_sort(view.endpoints.begin(), view.endpoints.end(),
+                   [](const EndpointRow& a, const EndpointRow& b) { return a.name < b.name; });
+  progress.step("reading the servers");
   readServers(session, view);
+  progress.step("reading the settings");
   readSettings(session, view);
-  view.classes = readClassRows(session);
+  view.classes = readClassRows(session, progress, countsAll);
   for (const ClassRow& row : view.classes) {
     if (!row.problem.empty()) addProblem(view.problems, row.name, row.problem);
   }

@@ -5,6 +5,7 @@
 #include <string>
 #include <vector>
 
+#include "cli/Progress.h"
 #include "cli/Session.h"
 #include "frontend/SettingsClaims.h"
 
@@ -51,8 +52,8 @@ struct ClassRow {
   std::string name;
   std::string provider;  ///< the prefix of its create functions; empty: not known, as with a server's
   std::string library;
-  std::optional<std::uint64_t> count;  ///< absent: the provider cannot be asked
-  std::string problem;                 ///< then: why
+  std::optional<std::uint64_t> count;  ///< absent: the provider cannot be asked, or that would take too long
+  std::string problem;                 ///< why it cannot be asked
 };
 
 /// Why some classes, or the associations of some objects, could not be asked.
@@ -83,11 +84,16 @@ std::vector<Problem> problemsOf(const std::vector<ClassRow>& rows);
 /// "ZORVA_A, ZORVA_B: CIM_ERR_FAILED (1): no library"; of many names the first ones and how many more.
 std::string problemText(const Problem& problem);
 
-/// Asks the providers. What one of them does not answer is left empty and told in `problems`.
-HostView readHostView(Session& session);
+/// Asks the providers. What one of them does not answer is left empty and told in `problems`. Endpoints and settings
+/// are in the order of their names.
+HostView readHostView(Session& session, Progress& progress, bool countsAll);
 
-/// The classes that the registry knows, with their instances counted.
-std::vector<ClassRow> readClassRows(Session& session);
+/// The classes that the registry knows, with their instances counted. To count an association may take the square of
+/// the time that its ends take; where those are very many, that is done only if `countsAll`.
+std::vector<ClassRow> readClassRows(Session& session, Progress& progress, bool countsAll);
+
+/// Whether some class was not counted because that would take too long.
+bool isUncounted(const std::vector<ClassRow>& rows);
 
 /// The instances of a class. Throws Failure where they cannot be had.
 std::vector<broker::Instance> instancesOf(Session& session, std::string_view className);

@@ -1,8 +1,15 @@
 // ifcfg init, ifcfg show.
+#include <sys/stat.h>
+#include <unistd.h>
+
 #include <algorithm>
+#include <cerrno>
+#include <cstring>
 #include <iterator>
 
+#include "agent/Agent.h"
 #include "cli/Commands.h"
+#include "cli/Failure.h"
 #include "cli/JsonOutput.h"
 #include "cli/ResultWriter.h"
 #include "cli/Session.h"
@@ -24,16 +31,25 @@ std::string settingTable(const std::vector<SettingLine>& lines, const Layout& la
   return table.text(layout);
 }
 
+/// A fresh installation has no data directory yet. One of another name that is missing is more likely misspelt.
+void makeDefaultDirectory() {
+  const std::string directory = zorvagent::dataDirectory();
+  if (directory != zorvagent::kDefaultDataDir || ::geteuid() != 0) return;
+  if (::mkdir(directory.c_str(), 0755) == 0 || errno == EEXIST) return;
+  throw Failure(ExitCode::Failed, directory + ": cannot be made: " + std::strerror(errno));
+}
+
 }  // namespace
 
 void initInterfaceFile(const Arguments& arguments) {
   requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "ifcfg init");
   requireLocal(arguments, "ifcfg init");
-  const Session session(arguments);
+  Session session(arguments);
   const auto tree = session.tree();
   const SettingFile file(arguments.target);
   const std::vector<SettingLine> lines = settingsOfHost(interfaceNode(*tree, arguments.target));
   if (!arguments.dryRun) {
+    makeDefaultDirectory();
     const Session::Changing alone(session);
     file.write(lines, arguments.force);
   }

@@ -11,6 +11,7 @@
 #include "agent/Agent.h"
 #include "cli/Failure.h"
 #include "cli/LocalOperations.h"
+#include "cli/Progress.h"
 #include "cli/RemoteOperations.h"
 #include "cli/Text.h"
 #include "schema/Names.h"
@@ -37,6 +38,7 @@ std::string similarNames(const schema::ClassRepository& classes, std::string_vie
 
 void tell(const char* kind, std::string_view what) {
   std::fflush(stdout);
+  Progress::makeRoom();
   const std::string line = std::string("zorvactl: ") + kind + std::string(what) + "\n";
   std::fwrite(line.data(), 1, line.size(), stderr);
 }
@@ -139,7 +141,7 @@ Operations& Session::cim() {
   return *cim_;
 }
 
-Session::Changing::Changing(const Session& session, bool isDryRun) {
+Session::Changing::Changing(Session& session, bool isDryRun) : quiet_(session) {
   if (session.isRemote() || isDryRun) return;
   try {
     hold_.emplace(session.claims_);

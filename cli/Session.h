@@ -49,17 +49,6 @@ class Session {
   /// host, or the file that stands for it, cannot be read: the providers would only say that there is nothing.
   Operations& cim();
 
-  /// While it lives, nobody else changes settings of this host: for commands that read, decide and then change. Does
-  /// nothing where a server is asked or on a dry run. Throws Failure where the lock of the data directory cannot be
-  /// had.
-  class Changing {
-   public:
-    explicit Changing(const Session& session, bool isDryRun = false);
-
-   private:
-    std::optional<frontend::SettingsClaims::Hold> hold_;
-  };
-
   /// The classes alone, for commands that ask nothing of a provider.
   const std::shared_ptr<const schema::ClassRepository>& classes();
 
@@ -78,6 +67,18 @@ class Session {
 
    private:
     Session& session_;
+  };
+
+  /// While it lives, nobody else changes settings of this host: for commands that read, decide and then change. It has
+  /// no lock where a server is asked or on a dry run. Such commands say themselves what failed: it is quiet, too.
+  /// Throws Failure where the lock of the data directory cannot be had.
+  class Changing {
+   public:
+    explicit Changing(Session& session, bool isDryRun = false);
+
+   private:
+    const Quiet quiet_;
+    std::optional<frontend::SettingsClaims::Hold> hold_;
   };
 
  private:

@@ -1,9 +1,10 @@
 // dns, domain, suffixes: what a person wants to type, made of the CIM operations.
+#include <ProviderUtilities.h>
 #include <arpa/inet.h>
+#include <netinet/in.h>
 
 #include <algorithm>
 #include <cstring>
-#include <optional>
 
 #include "cli/Assignments.h"
 #include "cli/Change.h"
@@ -15,6 +16,7 @@
 #include "cli/Session.h"
 #include "cli/Text.h"
 #include "cli/ValueText.h"
+#include "schema/Names.h"
 
 namespace zorva::cli {
 
@@ -80,25 +82,88 @@ void requireReadable(const Arguments& arguments, const char* subcommand) {
   requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, subcommand);
 }
 
-/// An address as inet_pton has it, with a zone behind an IPv6 one or not.
-void requireAddress(const std::string& text) {
-  requirePlainText("SERVER", text);
+/// An address in a form in which all spellings of one are the same.
+struct Address {
+  int family = AF_UNSPEC;  ///< AF_UNSPEC: the text is no address
+  std::string bytes;
+  std::string zone;  ///< what follows "%" after an IPv6 address
+
+  bool operator==(const Address&) const = default;
+};
+
+/// An address as inet_pton has it, with a zone after an IPv6 one or not.
+Address addressOf(const std::string& text) {
   const std::string address = text.substr(0, text.find('%'));
   const bool hasZone = address.size() < text.size();
-  unsigned char bytes[sizeof(in6_addr)];
-  const bool isV4 = !hasZone && ::inet_pton(AF_INET, address.c_str(), bytes) == 1;
-  const bool isV6 =
-      ::inet_pton(AF_INET6, address.c_str(), bytes) == 1 && text.back() != '%' && text.find(' ') == std::string::npos;
-  if (isV4 || isV6) return;
-  throw Failure(ExitCode::WrongUsage, "'" + printable(text) + "' is no IP address",
-                "a server is given by its address: 192.0.2.53 or 2001:db8::53");
+  in6_addr bytes{};
+  if (!hasZone && ::inet_pton(AF_INET, address.c_str(), &bytes) == 1) {
+    return {AF_INET, {reinterpret_cast<const char*>(&bytes), sizeof(in_addr)}, {}};
+  }
+  if (::inet_pton(AF_INET6, address.c_str(), &bytes) != 1 || text.back() == '%' ||
+      text.find(' ') != std::string::npos) {
+    return {};
+  }
+  const char* from = reinterpret_cast<const char*>(&bytes);
+  if (IN6_IS_ADDR_V4MAPPED(&bytes)) return {AF_INET, {from + sizeof(in6_addr) - sizeof(in_addr), sizeof(in_addr)}, {}};
+  return {AF_INET6, {from, sizeof(in6_addr)}, hasZone ? text.substr(address.size() + 1) : std::string()};
 }
+
+bool isMulticast(const Address& address) {
+  const auto first = static_cast<unsigned char>(address.bytes.front());
+  return address.family == AF_INET ? (first & 0xF0U) == 0xE0U : first == 0xFFU;
+}
+
+bool isUnspecified(const Address& address) { return address.bytes.find_first_not_of('\0') == std::string::npos; }
+
+Failure refused(const std::string& word, const std::string& why, const std::string& hint = {}) {
+  return {ExitCode::WrongUsage, "'" + printable(word) + "' " + why, hint};
+}
+
+void requireServer(const std::string& text) {
+  requirePlainText("SERVER", text);
+  const Address address = addressOf(text);
+  if (address.family == AF_UNSPEC) {
+    throw refused(text, "is no IP address", "a server is given by its address: 192.0.2.53 or 2001:db8::53");
+  }
+  if (isMulticast(address)) throw refused(text, "is a multicast address; no server has one");
+  if (isUnspecified(address)) throw refused(text, "is the unspecified address; no server has it");
+}
+
+/// As the providers judge it, for a server might, too.
+bool isName(const std::string& text) { return ZV::ProviderUtilities::ValidateInput(text, {}) != 0; }
+
+constexpr const char* kNameRule =
+    "letters, digits, '-' and '_' between single dots, at most 63 in each part and 253 in all";
 
 void requireSuffix(const std::string& text) {
   requirePlainText("SUFFIX", text);
-  if (!text.empty() && text.find(' ') == std::string::npos) return;
-  throw Failure(ExitCode::WrongUsage, "'" + printable(text) + "' is no suffix: it is empty or holds a blank",
-                "give each suffix as a word of its own");
+  if (text.empty() || !isName(text)) throw refused(text, "is no suffix", std::string("a suffix is ") + kNameRule);
+}
+
+bool sameServer(const std::string& a, const std::string& b) {
+  const Address address = addressOf(a);
+  return a == b || (address.family != AF_UNSPEC && address == addressOf(b));
+}
+
+bool sameSuffix(const std::string& a, const std::string& b) {
+  const auto plain = [](std::string_view text) { return text.substr(0, text.size() - (text.ends_with('.') ? 1 : 0)); };
+  return schema::sameName(plain(a), plain(b));
+}
+
+using Same = bool (*)(const std::string& a, const std::string& b);
+
+bool isAmong(const std::string& text, const std::vector<std::string>& texts, Same same) {
+  return std::any_of(texts.begin(), texts.end(), [&](const std::string& each) { return same(each, text); });
+}
+
+/// Each word by itself, and none twice.
+void requireEach(const std::vector<std::string>& words, void (*require)(const std::string& word), Same same) {
+  std::vector<std::string> before;
+  for (const std::string& word : words) {
+    require(word);
+    if (isAmong(word, before, same)) throw refused(word, "is given twice");
+    before.push_back(word);
+  }
 }
 
 std::vector<std::string> without(std::vector<std::string> texts, const std::vector<std::string>& removed,
@@ -114,9 +179,9 @@ std::vector<std::string> without(std::vector<std::string> texts, const std::vect
   return texts;
 }
 
-std::vector<std::string> with(std::vector<std::string> texts, const std::vector<std::string>& added) {
+std::vector<std::string> with(std::vector<std::string> texts, const std::vector<std::string>& added, Same same) {
   for (const std::string& text : added) {
-    if (std::find(texts.begin(), texts.end(), text) == texts.end()) texts.push_back(text);
+    if (!isAmong(text, texts, same)) texts.push_back(text);
   }
   return texts;
 }
@@ -131,7 +196,7 @@ void showServers(const Arguments& arguments) {
 
 void setServers(const Arguments& arguments) {
   requireReadable(arguments, "dns set");
-  for (const std::string& server : arguments.values) requireAddress(server);
+  requireEach(arguments.values, requireServer, sameServer);
   Session session(arguments);
   const Session::Changing alone(session, arguments.dryRun);
   change(session, arguments, settingOfInterface(session, arguments.target), kServers,
@@ -140,12 +205,12 @@ void setServers(const Arguments& arguments) {
 
 void addServers(const Arguments& arguments) {
   requireReadable(arguments, "dns add");
-  for (const std::string& server : arguments.values) requireAddress(server);
+  requireEach(arguments.values, requireServer, sameServer);
   Session session(arguments);
   const Session::Changing alone(session, arguments.dryRun);
   const broker::Instance setting = settingOfInterface(session, arguments.target);
   change(session, arguments, setting, kServers,
-         broker::Value::textArray(with(listOf(setting, kServers), arguments.values)));
+         broker::Value::textArray(with(listOf(setting, kServers), arguments.values, sameServer)));
 }
 
 void removeServers(const Arguments& arguments) {
@@ -159,11 +224,12 @@ void removeServers(const Arguments& arguments) {
 
 void setDomain(const Arguments& arguments) {
   requireReadable(arguments, "domain");
-  requirePlainText("NAME", arguments.values.front());
+  const std::string& name = arguments.values.front();
+  requirePlainText("NAME", name);
+  if (!isName(name)) throw refused(name, std::string("is no domain name: it has ") + kNameRule);
   Session session(arguments);
   const Session::Changing alone(session, arguments.dryRun);
-  change(session, arguments, settingOfInterface(session, arguments.target), "DomainName",
-         broker::Value::text(arguments.values.front()));
+  change(session, arguments, settingOfInterface(session, arguments.target), "DomainName", broker::Value::text(name));
 }
 
 void showSuffixes(const Arguments& arguments) {
@@ -174,7 +240,7 @@ void showSuffixes(const Arguments& arguments) {
 
 void setSuffixes(const Arguments& arguments) {
   requireReadable(arguments, "suffixes set");
-  for (const std::string& suffix : arguments.values) requireSuffix(suffix);
+  requireEach(arguments.values, requireSuffix, sameSuffix);
   Session session(arguments);
   const Session::Changing alone(session, arguments.dryRun);
   change(session, arguments, settingOfHost(session), kSuffixes, broker::Value::textArray(arguments.values));
@@ -182,12 +248,12 @@ void setSuffixes(const Arguments& arguments) {
 
 void addSuffixes(const Arguments& arguments) {
   requireReadable(arguments, "suffixes add");
-  for (const std::string& suffix : arguments.values) requireSuffix(suffix);
+  requireEach(arguments.values, requireSuffix, sameSuffix);
   Session session(arguments);
   const Session::Changing alone(session, arguments.dryRun);
   const broker::Instance setting = settingOfHost(session);
   change(session, arguments, setting, kSuffixes,
-         broker::Value::textArray(with(listOf(setting, kSuffixes), arguments.values)));
+         broker::Value::textArray(with(listOf(setting, kSuffixes), arguments.values, sameSuffix)));
 }
 
 void removeSuffixes(const Arguments& arguments) {

@@ -76,12 +76,28 @@ Table classTable(const std::vector<ClassRow>& rows) {
   return table;
 }
 
+void tellUncounted(const std::vector<ClassRow>& rows) {
+  if (isUncounted(rows))
+    tellNote("the associations of so many objects are not counted; --all counts them, which takes long");
+}
+
+HostView viewOf(Session& session, bool countsAll) {
+  Progress progress;
+  return readHostView(session, progress, countsAll);
+}
+
+std::vector<ClassRow> classesOf(Session& session, bool countsAll) {
+  Progress progress;
+  return readClassRows(session, progress, countsAll);
+}
+
 }  // namespace
 
 void showHost(const Arguments& arguments) {
   requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "show");
   Session session(arguments);
-  const HostView view = readHostView(session);
+  const HostView view = viewOf(session, arguments.all);
+  tellUncounted(view.classes);
   if (arguments.output == OutputFormat::Json) {
     write(hostViewJson(view) + "\n");
     return;
@@ -102,7 +118,8 @@ void showHost(const Arguments& arguments) {
 void listClasses(const Arguments& arguments) {
   requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "classes");
   Session session(arguments);
-  const std::vector<ClassRow> rows = readClassRows(session);
+  const std::vector<ClassRow> rows = classesOf(session, arguments.all);
+  tellUncounted(rows);
   if (arguments.output == OutputFormat::Json) {
     write(classRowsJson(rows) + "\n");
     return;

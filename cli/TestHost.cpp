@@ -2,9 +2,11 @@
 
 #include <fcntl.h>
 #include <poll.h>
+#include <sched.h>
 #include <signal.h>
 #include <stdlib.h>
 #include <sys/ioctl.h>
+#include <sys/mount.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
@@ -45,7 +47,7 @@ Pair makeTerminal() {
 
 Pair makeOutput(OutputTo output) {
   if (output == OutputTo::Terminal) return makeTerminal();
-  if (output == OutputTo::Pipe) return makePipe();
+  if (output == OutputTo::Pipe || output == OutputTo::ErrorTerminal) return makePipe();
   return {::open("/dev/null", O_RDONLY | O_CLOEXEC), ::open("/dev/full", O_WRONLY | O_CLOEXEC)};
 }
 
@@ -127,6 +129,12 @@ std::vector<std::string> TestHost::twoInterfaces() {
           port("eth1")};
 }
 
+std::vector<std::string> TestHost::manyInterfaces(int count) {
+  std::vector<std::string> ports;
+  for (int i = 0; i < count; ++i) ports.push_back(port("eth" + std::to_string(i), R"("domain_name": "example.org")"));
+  return ports;
+}
+
 Outcome TestHost::run(const std::vector<std::string>& words, OutputTo output) const {
   return runWith({}, words, output);
 }
@@ -146,6 +154,15 @@ Outcome TestHost::runLimited(std::size_t bytes, AtLimit atLimit, const std::vect
   return runPrepared(limit, {}, words, OutputTo::Pipe);
 }
 
+Outcome TestHost::runOnFreshMachine(const std::vector<std::string>& words) const {
+  const auto hide = [] {
+    return ::geteuid() == 0 && ::unshare(CLONE_NEWNS) == 0 &&
+           ::mount("none", "/", nullptr, MS_REC | MS_PRIVATE, nullptr) == 0 &&
+           ::mount("none", "/var/lib", "tmpfs", 0, "size=1m") == 0;
+  };
+  return runPrepared(hide, {}, words, OutputTo::Pipe);
+}
+
 Outcome TestHost::runAsNobody(const std::vector<std::string>& words) const {
   const unsigned nobody = 65534;
   const bool isRoot = ::geteuid() == 0;
@@ -160,7 +177,7 @@ Outcome TestHost::runAsNobody(const std::vector<std::string>& words) const {
 Outcome TestHost::runPrepared(const std::function<bool()>& prepare, const Environment& environment,
                               const std::vector<std::string>& words, OutputTo output) const {
   const Pair out = makeOutput(output);
-  const Pair err = makePipe();
+  const Pair err = output == OutputTo::ErrorTerminal ? makeTerminal() : makePipe();
   const pid_t child = ::fork();
   if (child < 0) throw std::runtime_error("no process");
   if (child == 0) {

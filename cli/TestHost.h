@@ -18,8 +18,8 @@ struct Outcome {
   std::string err;
 };
 
-/// Where a run's standard output goes.
-enum class OutputTo { Pipe, Terminal, FullDevice };
+/// Where a run's standard output goes. With ErrorTerminal standard error is a terminal, and standard output a pipe.
+enum class OutputTo { Pipe, Terminal, FullDevice, ErrorTerminal };
 
 /// A host that is a tree in a file, with a data directory of its own.
 class TestHost {
@@ -45,6 +45,10 @@ class TestHost {
   /// Runs it so that no file can grow past that many bytes, as on a full disk.
   Outcome runLimited(std::size_t bytes, AtLimit atLimit, const std::vector<std::string>& words) const;
 
+  /// Runs it where nothing was installed yet: /var/lib is empty, and what is written there is gone again afterwards.
+  /// Exit code 127: no such place can be made here.
+  Outcome runOnFreshMachine(const std::vector<std::string>& words) const;
+
   const zorvagent::testing::TemporaryDirectory& directory() const { return directory_; }
   std::string dataFile(const std::string& name) const { return directory_ / "data/" + name; }
   void writeTree(const std::string& json) const;
@@ -52,6 +56,8 @@ class TestHost {
   /// A port of that name with the usual properties, and these instead of them or besides: R"("domain_name": "x")".
   static std::string port(const std::string& name, const std::string& properties = {});
   static std::vector<std::string> twoInterfaces();
+  /// "eth0", "eth1" and so on.
+  static std::vector<std::string> manyInterfaces(int count);
 
  private:
   using Environment = std::vector<std::pair<std::string, std::string>>;

@@ -28,12 +28,15 @@ class ZORVA_AGENT_API ConfigError : public std::runtime_error {
   std::string problem_;
 };
 
+// Where the agent keeps what was set.
+inline constexpr const char* kDefaultDataDir = "/var/lib/zorvagent/";
+
 // Paths that are not absolute are taken from the directory of the configuration's file.
 struct Config {
   std::string file;  // what it was read from; empty for the built-in defaults
 
   // [agent]
-  std::string dataDir = "/var/lib/zorvagent/";  // ends in a slash
+  std::string dataDir = kDefaultDataDir;  // ends in a slash
   std::string systemName;                       // empty: the name that the tree's source tells
   std::string language = "en";
 

@@ -1,0 +1,87 @@
+// What README.md shows and tells people to type, on the host that it shows.
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <sstream>
+
+#include "cli/TestHost.h"
+
+namespace zorva::cli {
+namespace {
+
+using testing::HasSubstr;
+using zorvagent::testing::contentsOf;
+
+std::string readme() { return contentsOf(ZORVA_SOURCE_DIR "/README.md"); }
+
+TestHost shownHost() {
+  return TestHost({TestHost::port("eth0", R"("domain_name": "example.org", "dns_suffixes": ["example.org"])"),
+                   TestHost::port("eth1", R"("dns_server_addresses": [])")});
+}
+
+/// What stands in backquotes of its own lines after that text.
+std::string blockAfter(const std::string& text) {
+  const std::string all = readme();
+  const std::size_t from = all.find("```\n", all.find(text)) + 4;
+  EXPECT_NE(all.find(text), std::string::npos) << text;
+  return all.substr(from, all.find("```", from) - from);
+}
+
+/// The words of a line as a shell takes them, up to a comment; of quotes it may have single ones.
+std::vector<std::string> wordsOf(const std::string& line) {
+  std::vector<std::string> words;
+  bool isQuoted = false;
+  bool isInWord = false;
+  for (const char c : line) {
+    if (c == '#' && !isQuoted && !isInWord) break;
+    if (c == ' ' && !isQuoted) {
+      isInWord = false;
+      continue;
+    }
+    if (!isInWord) words.emplace_back();
+    isInWord = true;
+    if (c == '\'') {
+      isQuoted = !isQuoted;
+    } else {
+      words.back() += c;
+    }
+  }
+  return words;
+}
+
+/// Runs the lines "./run -- ..." of a block, one after the other, each of which has to do what it says.
+void runAll(const TestHost& host, const std::string& block) {
+  std::istringstream lines(block);
+  int count = 0;
+  for (std::string line; std::getline(lines, line);) {
+    std::vector<std::string> words = wordsOf(line);
+    if (words.size() < 3 || words[0] != "./run" || words[1] != "--") continue;
+    words.erase(words.begin(), words.begin() + 2);
+    const Outcome outcome = host.run(words);
+    EXPECT_EQ(outcome.exitCode, 0) << line;
+    EXPECT_EQ(outcome.err, "") << line;
+    ++count;
+  }
+  EXPECT_GE(count, 4);
+}
+
+TEST(Readme, ShowsWhatShowSays) {
+  const std::string shown = shownHost().run({"show"}).out;
+  const std::string untilClasses = shown.substr(0, shown.find("Classes\n"));
+  EXPECT_THAT(blockAfter("## What you see"), HasSubstr("$ ./run\n" + untilClasses));
+}
+
+TEST(Readme, ItsCommandsThatReadWork) { runAll(shownHost(), blockAfter("What follows `--` goes to `zorvactl`")); }
+
+TEST(Readme, ItsCommandsThatChangeWorkInTheirOrder) {
+  const TestHost host = shownHost();
+  runAll(host, blockAfter("Settings are changed with"));
+  EXPECT_THAT(contentsOf(host.dataFile("ifcfg-eth0")), HasSubstr("DOMAINNAME=lab.example.org\n"));
+}
+
+TEST(Readme, SaysOnItsFirstScreenWhatAChangeDoesNotReach) {
+  EXPECT_LT(readme().find("It does not reach the host's resolver yet"), readme().find("\n## "));
+}
+
+}  // namespace
+}  // namespace zorva::cli
