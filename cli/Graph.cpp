@@ -116,6 +116,8 @@ class Walk {
   }
 
   void add(const broker::Instance& association) {
+    // A server says by it which profile an object conforms to. That is no part of the configuration.
+    if (schema::sameName(association.path.className, "CIM_ElementConformsToProfile")) return;
     std::vector<GraphEnd> ends;
     for (const broker::Property& property : association.properties) {
       const auto* path = std::get_if<broker::Boxed<broker::ObjectPath>>(&property.value.scalar);

@@ -116,15 +116,22 @@ TEST_F(Remote, GetsTheSame) {
 
 TEST_F(Remote, FollowsTheSameAssociations) {
   for (const char* format : {"table", "json"}) {
-    expectSame({"ai", kEth0, "-o", format});
-    expectSame({"ain", kEth0, "-o", format});
-    expectSame({"ri", kEth0, "-o", format});
+    for (const char* name : {"CIM_Dependency", "CIM_ElementSettingData"}) {
+      expectSame({"ai", kEth0, "--assoc-class", name, "-o", format});
+      expectSame({"ain", kEth0, "--assoc-class", name, "-o", format});
+      expectSame({"ri", kEth0, "--result-class", name, "-o", format});
+    }
     expectSame({"rin", R"(ZORVA_RemoteServiceAccessPoint.Name="192.0.2.53")", "-o", format});
   }
   expectSame({"ai", kEth0, "--result-class", "CIM_RemoteServiceAccessPoint", "--property", "Name"});
   expectSame({"ain", kEth0, "--assoc-class", "CIM_Dependency", "--role", "Dependent", "--result-role", "Antecedent"});
   expectSame({"ri", kSetting, "--result-class", "ZORVA_DNSOrderedComponent", "--role", "PartComponent"});
   expectSame({"ain", R"(ZORVA_SPComputerSystem)"});
+}
+
+TEST_F(Remote, FindsTheProfileOfAnEndpoint) {
+  EXPECT_THAT(remote({"ain", kEth0}).out, HasSubstr("interop:CIM_RegisteredProfile.InstanceID="));
+  EXPECT_THAT(local({"ain", kEth0}).out, Not(HasSubstr("CIM_RegisteredProfile")));
 }
 
 TEST_F(Remote, DrawsTheSameGraph) {
