@@ -119,6 +119,12 @@ unsigned short failBuilder(const Operation& operation, const char* text, const P
   return 1;
 }
 
+unsigned short failAndLeaveBuilder(const Operation& operation, const char* text, const Place& place) {
+  complain(operation, text, place);
+  markExit(operation, place);
+  return 1;
+}
+
 void returnBuilt(const Operation& operation, Builder build, const char** properties) {
   std::vector<CMPIInstance*> instances;
   if (build(operation.context, operation.ref, properties, instances) == 0) returnAll(operation.result, instances);

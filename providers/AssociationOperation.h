@@ -98,8 +98,10 @@ void deliverPathOnThisHost(Operation& operation, const CMPIInstance* reference, 
 using Builder = unsigned short (*)(const CMPIContext* context, const CMPIObjectPath* ref, const char** properties,
                                    std::vector<CMPIInstance*>& instances);
 
-// An error that ends a builder; always 1, its result.
+// An error that ends a builder; always 1, its result. The second marks the exit too: five builders do where the
+// settings cannot be fetched.
 unsigned short failBuilder(const Operation& operation, const char* text, const Place& place = Place::here());
+unsigned short failAndLeaveBuilder(const Operation& operation, const char* text, const Place& place = Place::here());
 
 // All that is built; nothing where the builder fails.
 void returnBuilt(const Operation& operation, Builder build, const char** properties);

@@ -54,9 +54,7 @@ static unsigned short DNSEndpointElementSettingDataCMPIInstances(const CMPIConte
   }
   std::vector<CMPIObjectPath*> settings;
   if (getAllDNSSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
-    complain(operation, "getAllDNSSettingDataCMPIObjectPaths failed");
-    markExit(operation);
-    return 1;
+    return failAndLeaveBuilder(operation, "getAllDNSSettingDataCMPIObjectPaths failed");
   }
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
   for (CMPIObjectPath* endpoint : counted16(endpoints)) {

@@ -32,9 +32,7 @@ static unsigned short DNSGenEndpointElementSettingDataCMPIInstances(const CMPICo
   }
   std::vector<CMPIObjectPath*> settings;
   if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
-    complain(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
-    markExit(operation);
-    return 1;
+    return failAndLeaveBuilder(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
   }
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
   for (CMPIObjectPath* endpoint : counted16(endpoints)) {

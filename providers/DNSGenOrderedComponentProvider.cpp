@@ -44,9 +44,7 @@ static unsigned short DNSGeneralOrderedComponentCMPIInstances(const CMPIContext*
   }
   std::vector<CMPIObjectPath*> settings;
   if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
-    complain(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
-    markExit(operation);
-    return 1;
+    return failAndLeaveBuilder(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
   }
   while (hasNext(assignments, &operation.status)) {
     const CMPIObjectPath* assignment = nextPath(assignments, &operation.status);

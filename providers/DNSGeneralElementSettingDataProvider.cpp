@@ -35,9 +35,7 @@ static unsigned short DNSGeneralElementSettingDataCMPIInstances(const CMPIContex
   }
   std::vector<CMPIObjectPath*> settings;
   if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
-    complain(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
-    markExit(operation);
-    return 1;
+    return failAndLeaveBuilder(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
   }
   while (hasNext(systems, &operation.status)) {
     const CMPIObjectPath* system = nextPath(systems, &operation.status);

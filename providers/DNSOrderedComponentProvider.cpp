@@ -52,9 +52,7 @@ static unsigned short DNSOrderedComponentCMPIInstances(const CMPIContext* contex
   }
   std::vector<CMPIObjectPath*> settings;
   if (getAllDNSSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
-    complain(operation, "getAllDNSSettingDataCMPIObjectPaths failed");
-    markExit(operation);
-    return 1;
+    return failAndLeaveBuilder(operation, "getAllDNSSettingDataCMPIObjectPaths failed");
   }
   while (hasNext(assignments, &operation.status)) {
     const CMPIObjectPath* assignment = nextPath(assignments, &operation.status);
