@@ -98,7 +98,8 @@ struct ThingA {
   std::vector<std::string> labels = {"x", "y"};
 };
 std::mutex thingMutex;
-ThingA thingA;
+// Never destroyed: a broker that ends with the process cleans its providers up after the library's own objects.
+ThingA& thingA = *new ThingA;
 
 CMPIStatus cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
   const std::lock_guard lock(thingMutex);

@@ -14,6 +14,9 @@ for compiler in "$4" "$5"; do
   command -v "$compiler" >/dev/null || { echo "skipped: there is no $compiler"; exit 77; }
 done
 
+# A compiler cache may answer with the dependencies of another folder's build.
+export CCACHE_DISABLE=1
+
 rm -rf "${work:?}/headers"
 mkdir -p "$work/headers"
 if [ "$headers" = other ]; then
