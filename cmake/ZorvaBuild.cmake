@@ -17,8 +17,12 @@ include(GNUInstallDirs)
 
 find_program(ZORVA_CCACHE ccache)
 if(ZORVA_CCACHE)
-  set(CMAKE_CXX_COMPILER_LAUNCHER ${ZORVA_CCACHE})
-  set(CMAKE_C_COMPILER_LAUNCHER ${ZORVA_CCACHE})
+  # What it needs to know of precompiled headers: that they are younger than the build and that no macro hides in them.
+  set(ZORVA_CCACHE_LAUNCHER ${CMAKE_COMMAND} -E env
+    CCACHE_SLOPPINESS=pch_defines,time_macros,include_file_mtime,include_file_ctime ${ZORVA_CCACHE})
+  set(CMAKE_CXX_COMPILER_LAUNCHER ${ZORVA_CCACHE_LAUNCHER})
+  set(CMAKE_C_COMPILER_LAUNCHER ${ZORVA_CCACHE_LAUNCHER})
+  add_compile_options("$<$<COMPILE_LANG_AND_ID:CXX,GNU>:-fpch-preprocess>")
 endif()
 
 # Which of CMPI's platform symbols holds here; the headers refuse to compile without one.
@@ -31,6 +35,8 @@ add_compile_options(
 # never set in copies of std::variant (GCC bug 105562), where there are none.
 add_compile_options(
   "$<$<AND:$<CXX_COMPILER_ID:GNU>,$<VERSION_LESS:$<CXX_COMPILER_VERSION>,13>>:-Wno-restrict;-Wno-maybe-uninitialized>")
+# Memory is there: without collecting garbage g++ takes a tenth less time for a test.
+add_compile_options("$<$<COMPILE_LANG_AND_ID:CXX,GNU>:SHELL:--param ggc-min-heapsize=524288>")
 add_link_options(-Wl,--as-needed)
 
 if(ZORVA_SANITIZE STREQUAL "address")
@@ -70,6 +76,35 @@ function(zorva_install_library target)
   install(TARGETS ${target} LIBRARY NAMELINK_SKIP)
 endfunction()
 
+# Headers that many sources include are compiled once for all of them. A build without tests is made without, so that it
+# shows whether each source includes what it uses.
+option(ZORVA_PRECOMPILE "Precompile the standard library's and GoogleTest's headers" ${ZORVA_BUILD_TESTS})
+
+# zorva_precompile_headers(TARGETS...): their sources see the standard library's headers precompiled.
+function(zorva_precompile_headers)
+  if(ZORVA_PRECOMPILE)
+    foreach(target ${ARGN})
+      target_precompile_headers(${target} REUSE_FROM zorva_standard_headers)
+    endforeach()
+  endif()
+endfunction()
+
+# Tests say where they failed by themselves, so that their debug information is file and line for a stack trace; it
+# costs a sixth of their compilation to have local variables as well. Position-independent like the libraries, since a
+# precompiled header serves only one kind of code.
+set(ZORVA_TEST_DEBUG_INFO "-g1" CACHE STRING "Debug information of the tests; -g to step through one in a debugger")
+set(ZORVA_TEST_OPTIONS -fPIC "$<$<CONFIG:Debug>:${ZORVA_TEST_DEBUG_INFO}>")
+
+# zorva_build_as_test(TARGET): compiles a program or a library of tests as all of them are.
+function(zorva_build_as_test target)
+  target_link_libraries(${target} PUBLIC GTest::gmock)
+  target_compile_options(${target} PRIVATE ${ZORVA_TEST_OPTIONS})
+  if(ZORVA_PRECOMPILE)
+    target_link_libraries(${target} PUBLIC zorva_test_headers)
+    target_precompile_headers(${target} REUSE_FROM zorva_test_headers)
+  endif()
+endfunction()
+
 # zorva_add_test(NAME SOURCES files... LIBS libraries...): one GoogleTest program; each of its tests is a ctest test.
 function(zorva_add_test name)
   if(NOT ZORVA_BUILD_TESTS)
@@ -77,7 +112,8 @@ function(zorva_add_test name)
   endif()
   cmake_parse_arguments(ARG "" "" "SOURCES;LIBS;DEPENDS" ${ARGN})
   add_executable(${name} ${ARG_SOURCES})
-  target_link_libraries(${name} PRIVATE ${ARG_LIBS} GTest::gmock GTest::gtest_main)
+  target_link_libraries(${name} PUBLIC ${ARG_LIBS} GTest::gtest_main)
+  zorva_build_as_test(${name})
   target_compile_definitions(${name} PRIVATE
     ZORVA_LIB_DIR="${CMAKE_LIBRARY_OUTPUT_DIRECTORY}"
     ZORVA_BIN_DIR="${CMAKE_RUNTIME_OUTPUT_DIRECTORY}"

@@ -1,0 +1,1 @@
+// The library that precompiled headers belong to needs a source.

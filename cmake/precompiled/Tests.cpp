@@ -1,0 +1,4 @@
+#include "Tests.h"
+
+#define ZORVA_INSTANTIATED_HERE(...) template class __VA_ARGS__
+ZORVA_TEST_INSTANTIATIONS(ZORVA_INSTANTIATED_HERE);
