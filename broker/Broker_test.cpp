@@ -8,7 +8,7 @@
 #include <thread>
 
 #include "broker/PathText.h"
-#include "broker/TestClasses.h"
+#include "broker/testing/TestClasses.h"
 
 namespace zorva::broker {
 namespace {

@@ -11,7 +11,7 @@
 #include "broker/Request.h"
 #include "broker/Result.h"
 #include "broker/Scope.h"
-#include "broker/TestClasses.h"
+#include "broker/testing/TestClasses.h"
 
 // Objects of another broker in the process: ours takes them through their own tables.
 

@@ -6,7 +6,7 @@
 
 #include "broker/Broker.h"
 #include "broker/PathText.h"
-#include "broker/TestClasses.h"
+#include "broker/testing/TestClasses.h"
 
 namespace zorva::broker {
 namespace {

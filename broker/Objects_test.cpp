@@ -12,7 +12,7 @@
 #include "broker/Data.h"
 #include "broker/ObjectText.h"
 #include "broker/Scope.h"
-#include "broker/TestClasses.h"
+#include "broker/testing/TestClasses.h"
 
 // CMPI objects as a provider sees them: through their function tables alone.
 

@@ -16,7 +16,7 @@
 #include "broker/QueryObjects.h"
 #include "broker/Result.h"
 #include "broker/Scope.h"
-#include "broker/TestClasses.h"
+#include "broker/testing/TestClasses.h"
 
 // Every slot of every table is called: once with all that it wants, then with each pointer null in turn, then with each
 // object of another kind in turn. The list of slots comes from the facts about CMPI (generate_slot_test.py).

@@ -15,7 +15,7 @@
 #include "broker/Request.h"
 #include "broker/Result.h"
 #include "broker/Scope.h"
-#include "broker/TestClasses.h"
+#include "broker/testing/TestClasses.h"
 
 // What the broker offers providers that run threads of their own: CMPIBrokerExtFT, and attaching.
 

@@ -7,7 +7,7 @@
 #include <filesystem>
 #include <nlohmann/json.hpp>
 
-#include "cli/TestHost.h"
+#include "cli/testing/TestHost.h"
 
 namespace zorva::cli {
 namespace {

@@ -4,7 +4,7 @@
 
 #include <cstdlib>
 
-#include "cli/TestHost.h"
+#include "cli/testing/TestHost.h"
 
 namespace zorva::cli {
 namespace {

@@ -5,7 +5,7 @@
 
 #include <nlohmann/json.hpp>
 
-#include "cli/TestHost.h"
+#include "cli/testing/TestHost.h"
 
 namespace zorva::cli {
 namespace {

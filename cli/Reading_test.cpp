@@ -6,7 +6,7 @@
 #include <nlohmann/json.hpp>
 
 #include "cimxml/testing/Grammar.h"
-#include "cli/TestHost.h"
+#include "cli/testing/TestHost.h"
 
 namespace zorva::cli {
 namespace {

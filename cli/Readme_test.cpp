@@ -4,7 +4,7 @@
 
 #include <sstream>
 
-#include "cli/TestHost.h"
+#include "cli/testing/TestHost.h"
 
 namespace zorva::cli {
 namespace {

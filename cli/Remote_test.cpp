@@ -6,8 +6,8 @@
 #include <nlohmann/json.hpp>
 #include <regex>
 
-#include "cli/TestHost.h"
-#include "cli/TestServer.h"
+#include "cli/testing/TestHost.h"
+#include "cli/testing/TestServer.h"
 
 namespace zorva::cli {
 namespace {

@@ -1,7 +1,7 @@
 // ModifyInstance of ZORVA_DNSProtocolEndPoint, which writes to the nodes of the instrumentation tree.
 #include <filesystem>
 
-#include "providers/ModificationTestSupport.h"
+#include "providers/testing/ModificationTestSupport.h"
 
 extern "C" CMPIInstanceMI* DNSClientProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
 extern "C" CMPIInstanceMI* DNSSettingDataProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*);

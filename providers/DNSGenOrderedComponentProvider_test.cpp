@@ -1,6 +1,6 @@
 #include <stdexcept>
 
-#include "providers/SettingAssociations.h"
+#include "providers/testing/SettingAssociations.h"
 
 namespace ZV::Test {
 namespace {

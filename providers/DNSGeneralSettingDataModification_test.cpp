@@ -1,7 +1,7 @@
 // ModifyInstance of ZORVA_DNSGeneralSettingData, which writes to the file of the host's first interface.
 #include <filesystem>
 
-#include "providers/ModificationTestSupport.h"
+#include "providers/testing/ModificationTestSupport.h"
 
 extern "C" CMPIInstanceMI* DNSGeneralSettingDataProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*,
                                                                            CMPIStatus*);

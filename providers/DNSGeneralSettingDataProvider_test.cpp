@@ -3,7 +3,7 @@
 
 #include "ProviderCall.h"
 #include "World.h"
-#include "providers/DoneOrFailed.h"
+#include "providers/testing/DoneOrFailed.h"
 
 extern "C" CMPIInstanceMI* DNSGeneralSettingDataProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*,
                                                                            CMPIStatus*);

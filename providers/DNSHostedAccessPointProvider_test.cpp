@@ -1,4 +1,4 @@
-#include "providers/AssociationTestSupport.h"
+#include "providers/testing/AssociationTestSupport.h"
 
 extern "C" CMPIInstanceMI* DNSHostedAccessPointProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*,
                                                                           CMPIStatus*);

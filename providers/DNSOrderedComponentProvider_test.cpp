@@ -1,4 +1,4 @@
-#include "providers/SettingAssociations.h"
+#include "providers/testing/SettingAssociations.h"
 
 namespace ZV::Test {
 namespace {

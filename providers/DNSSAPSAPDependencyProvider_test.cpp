@@ -1,5 +1,5 @@
 #include "factory/DNSClientObjFactory.h"
-#include "providers/AssociationTestSupport.h"
+#include "providers/testing/AssociationTestSupport.h"
 
 extern "C" CMPIInstanceMI* DNSSAPSAPDependencyProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*,
                                                                          CMPIStatus*);

@@ -4,7 +4,7 @@
 #include <filesystem>
 #include <thread>
 
-#include "providers/ModificationTestSupport.h"
+#include "providers/testing/ModificationTestSupport.h"
 
 extern "C" CMPIInstanceMI* DNSSettingDataProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
 

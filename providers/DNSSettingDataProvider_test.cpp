@@ -8,7 +8,7 @@
 
 #include "ProviderCall.h"
 #include "World.h"
-#include "providers/DoneOrFailed.h"
+#include "providers/testing/DoneOrFailed.h"
 
 extern "C" CMPIInstanceMI* DNSSettingDataProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
 

@@ -1,5 +1,5 @@
 // The linker puts these functions in the place of the fetches of settings (--wrap), so that tests can stand in between.
-#include "SettingAssociations.h"
+#include "providers/testing/SettingAssociations.h"
 #include "factory/DNSGeneralSettingDataObjects.h"
 #include "factory/DNSSettingDataObjects.h"
 

@@ -1,6 +1,6 @@
 // The two associations whose groups are IP assignment settings, which the broker is asked for: what can fail there, and
 // what fails alike in both.
-#include "providers/SettingAssociations.h"
+#include "providers/testing/SettingAssociations.h"
 
 namespace ZV::Test {
 namespace {

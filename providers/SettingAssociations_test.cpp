@@ -1,5 +1,5 @@
 // What holds of all four associations of DNS settings alike.
-#include "providers/SettingAssociations.h"
+#include "providers/testing/SettingAssociations.h"
 
 #include <cctype>
 

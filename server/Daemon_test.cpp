@@ -15,8 +15,8 @@
 #include <fstream>
 #include <thread>
 
-#include "server/TestDaemon.h"
-#include "server/TestWire.h"
+#include "server/testing/TestDaemon.h"
+#include "server/testing/TestWire.h"
 
 namespace zorva::server {
 namespace {

@@ -13,7 +13,7 @@
 #include <thread>
 
 #include "server/Listener.h"
-#include "server/TestWire.h"
+#include "server/testing/TestWire.h"
 
 namespace zorva::server {
 namespace {

@@ -4,7 +4,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "server/ServiceHarness.h"
+#include "server/testing/ServiceHarness.h"
 
 namespace zorva::server {
 namespace {

@@ -6,7 +6,7 @@
 #include <thread>
 #include <vector>
 
-#include "server/ServiceHarness.h"
+#include "server/testing/ServiceHarness.h"
 
 namespace zorva::server {
 namespace {

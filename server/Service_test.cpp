@@ -8,7 +8,7 @@
 #include <thread>
 
 #include "cimxml/testing/Grammar.h"
-#include "server/ServiceHarness.h"
+#include "server/testing/ServiceHarness.h"
 
 namespace zorva::server {
 namespace {

@@ -4,7 +4,7 @@
 
 #include "RecordingLogger.h"
 #include "World.h"
-#include "settings/FileAtEachLine.h"
+#include "settings/testing/FileAtEachLine.h"
 
 namespace ZV::Test {
 namespace {

@@ -9,7 +9,7 @@
 
 #include "agent/Agent.h"
 #include "agent/files/FileWatch.h"
-#include "providers/AssociationTestSupport.h"
+#include "providers/testing/AssociationTestSupport.h"
 
 namespace ZV::Test {
 namespace {

@@ -1,6 +1,6 @@
 #include "Requests.h"
 
-#include "providers/AssociationTestSupport.h"
+#include "providers/testing/AssociationTestSupport.h"
 
 #define ZV_PROVIDER(prefix) \
   extern "C" CMPIInstanceMI* prefix##_Create_InstanceMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*)

@@ -1,4 +1,4 @@
-#include "server/TestWire.h"
+#include "server/testing/TestWire.h"
 
 #include <arpa/inet.h>
 #include <netinet/in.h>

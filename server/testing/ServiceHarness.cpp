@@ -1,11 +1,11 @@
-#include "server/ServiceHarness.h"
+#include "server/testing/ServiceHarness.h"
 
 #include <gtest/gtest.h>
 
 #include <algorithm>
 #include <memory>
 
-#include "broker/TestClasses.h"
+#include "broker/testing/TestClasses.h"
 #include "cimxml/ElementWriter.h"
 #include "cimxml/testing/Grammar.h"
 #include "schema/Names.h"

@@ -8,7 +8,7 @@
 #include "cmpift.h"
 #include "cmpimacs.h"
 
-// A provider library for the tests of this folder: it serves the classes of TestClasses.h, well or badly as they ask,
+// A provider library for the tests of the broker: it serves the classes of TestClasses.h, well or badly as they ask,
 // and writes what it was handed to the broker's log.
 
 namespace {

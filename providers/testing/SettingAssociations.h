@@ -5,7 +5,7 @@
 #include <functional>
 #include <vector>
 
-#include "AssociationTestSupport.h"
+#include "providers/testing/AssociationTestSupport.h"
 
 extern "C" {
 CMPIInstanceMI* DNSGenEndPointElementSettingDataProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*,

@@ -6,7 +6,7 @@
 #include "schema/ClassRepository.h"
 #include "schema/Mof.h"
 
-// The classes that TestProvider.cpp serves, for the tests of this folder.
+// The classes that TestProvider.cpp serves, for the tests of the broker.
 
 namespace zorva::broker::testing {
 

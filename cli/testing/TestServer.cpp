@@ -1,4 +1,4 @@
-#include "cli/TestServer.h"
+#include "cli/testing/TestServer.h"
 
 #include <arpa/inet.h>
 #include <fcntl.h>
@@ -13,7 +13,7 @@
 #include <cstdio>
 #include <stdexcept>
 
-#include "cli/TestHost.h"
+#include "cli/testing/TestHost.h"
 
 namespace zorva::cli {
 

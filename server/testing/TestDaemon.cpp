@@ -1,4 +1,4 @@
-#include "server/TestDaemon.h"
+#include "server/testing/TestDaemon.h"
 
 #include <fcntl.h>
 #include <poll.h>

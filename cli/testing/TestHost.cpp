@@ -1,4 +1,4 @@
-#include "cli/TestHost.h"
+#include "cli/testing/TestHost.h"
 
 #include <fcntl.h>
 #include <poll.h>
