@@ -2,6 +2,8 @@
 
 #include <gmock/gmock.h>
 
+#include <vector>
+
 #include "RecordingBroker.h"
 
 namespace ZV::Test {
@@ -44,6 +46,12 @@ TEST_F(CmpiSupport, AReferencePropertyNeedsItsInstanceAndItsPath) {
   instance->hdl = nullptr;
   setReference(instance, "Dependent", path("ZORVA_Y"));
   EXPECT_THAT(broker_.calls(), IsEmpty());
+}
+
+TEST_F(CmpiSupport, ElementsAreCountedInSixteenBits) {
+  const std::vector<char> elements(65536 + 2);
+  EXPECT_EQ(count16(elements), 2);
+  EXPECT_EQ(counted16(elements).size(), 2U);
 }
 
 }  // namespace

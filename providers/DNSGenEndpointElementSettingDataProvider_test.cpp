@@ -16,7 +16,6 @@ const char* const kNoSettingsForNames =
     "Can't get ObjectPaths for DNSGeneralSettingData.             Exiting EnumerateInstanceNames";
 const char* const kNoSettingsInBuilder = "getAllDNSGeneralSettingDataCMPIObjectPaths failed";
 const char* const kNoSettingPaths = "getAllDNSGeneralSettingDataCMPIObjectPaths Failed";
-const char* const kNoSettings = "getAllDNSGeneralSettingDataCMPIInstances Failed";
 const char* const kBadEndpoint = "CMPIObjectPath is NULL for DNS Server";
 const char* const kBadSettingInBuilder = "CMPIObjectPath is NULL for DNS Client";
 const char* const kBadSettingForNames = "CMPIObjectPath is NULL for DNSGeneralSettingData";
@@ -376,15 +375,6 @@ TEST_F(GenEndpointElementSettingData, FailedFetchOfSettingPathsIsToldAndLeftOpen
   }
 }
 
-TEST_F(GenEndpointElementSettingData, FailedFetchOfSettingsIsToldAndLeftOpen) {
-  installOne();
-  FetchHook hook;
-  hook.generalSettings = [](auto&) { return 1; };
-  const Outcome outcome = associators(endpointPath("eth0"));
-  EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "not done, not marked", kNoSettings));
-  EXPECT_THAT(outcome.instances(), IsEmpty());
-}
-
 TEST_F(GenEndpointElementSettingData, EndpointThatCannotBeMadeIsHandedOnAsItIs) {
   installThree();
   const Outcome outcome = failing(
@@ -392,20 +382,6 @@ TEST_F(GenEndpointElementSettingData, EndpointThatCannotBeMadeIsHandedOnAsItIs) 
   EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
   EXPECT_THAT(outcome.calls.only({"returnInstance"}),
               ElementsAre("returnInstance(I1)", "returnInstance(null)", "returnInstance(I2)"));
-}
-
-// Several settings are what no host has; each endpoint would go with each of them.
-TEST_F(GenEndpointElementSettingData, EveryEndpointMeetsEverySettingEndpointsOuter) {
-  installThree();
-  FetchHook hook;
-  hook.generalSettingPaths = [this](std::vector<CMPIObjectPath*>& paths) {
-    paths.push_back(broker.make(generalSettingPath("second"), "second"));
-    return 0;
-  };
-  const auto all = ElementsAre("bmc0 > dnsgen1:host1", "bmc0 > second", "eth0 > dnsgen1:host1", "eth0 > second",
-                               "eth1 > dnsgen1:host1", "eth1 > second");
-  EXPECT_THAT(pairsOf(enumerateInstanceNames()), all);
-  EXPECT_THAT(pairsOf(enumerateInstances()), all);
 }
 
 }  // namespace

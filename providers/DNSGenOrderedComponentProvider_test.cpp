@@ -138,21 +138,6 @@ TEST_F(GeneralOrderedComponent, WithoutSettingsTheAssociationOperationsEndAsUsua
   for (const Operation& run : allFrom(generalSettingPath())) EXPECT_EQ(2U, handedOut(run()));
 }
 
-// Two settings are what no host has.
-TEST_F(GeneralOrderedComponent, OfTwoSettingsTheBuilderTakesTheFirstAndReferencesTakeBoth) {
-  installOne();
-  FetchHook hook;
-  hook.generalSettingPaths = [this](std::vector<CMPIObjectPath*>& paths) {
-    paths.push_back(broker.make(generalSettingPath("second"), "second"));
-    return 0;
-  };
-  EXPECT_THAT(pairsOf(enumerateInstances()), ElementsAre("Computer%eth0%ipv4 > dnsgen1:host1"));
-  const auto both = ElementsAre("Computer%eth0%ipv4 > dnsgen1:host1", "Computer%eth0%ipv4 > second");
-  EXPECT_THAT(pairsOf(references(kAssignment)), both);
-  EXPECT_THAT(pairsOf(referenceNames(kAssignment)), both);
-  EXPECT_THAT(textsOf(associatorNames(kAssignment).paths(), "InstanceID"), ElementsAre("dnsgen1:host1", "second"));
-}
-
 // --- From an assignment to the setting
 
 TEST_F(GeneralOrderedComponent, SettingIsMadeFromTheSourceWithThePropertiesThatWereAskedFor) {

@@ -84,12 +84,8 @@ TEST_F(OrderedComponent, AssignmentsComeAsTheBrokerGivesThemEachWithTheSettingOf
 }
 
 TEST_F(OrderedComponent, MatchDoesNotEndTheSearchAmongTheSettings) {
-  installOne();
-  FetchHook hook;
-  hook.settingPaths = [this](std::vector<CMPIObjectPath*>& paths) {
-    paths.push_back(broker.make(kSetting, "again"));
-    return 0;
-  };
+  world.host().nic("eth0").nic("eth0").install();
+  serveAssignments({"Computer%eth0%ipv4"});
   EXPECT_THAT(enumerateInstances().instances(), SizeIs(2));
   EXPECT_THAT(associatorNames(kAssignment).paths(), SizeIs(2));
   EXPECT_THAT(references(kAssignment).instances(), SizeIs(2));
@@ -157,29 +153,6 @@ TEST_F(OrderedComponent, TextBeforeTheLastPercentSignIsCompared) {
     EXPECT_THAT(textsOf(associatorNames(source).paths(), "InstanceID"), ElementsAre(cut.setting));
     EXPECT_THAT(textsOf(associators(settingPath(cut.setting)).instances(), "InstanceID"), ElementsAre(cut.assignment));
     EXPECT_THAT(textsOf(associatorNames(settingPath(cut.setting)).paths(), "InstanceID"), ElementsAre(cut.assignment));
-  }
-}
-
-// Settings of this host have a "%"; others could do without.
-TEST_F(OrderedComponent, AssignmentWithoutPercentSignIsComparedWholeByTheBuilderAndStopsAllElse) {
-  world.host().nic("eth0").install();
-  serveAssignments({"plain"});
-  FetchHook hook;
-  hook.settingPaths = [this](std::vector<CMPIObjectPath*>& paths) {
-    paths.push_back(broker.make(settingPath("plain"), "plain"));
-    return 0;
-  };
-  for (const Operation& run : enumerations()) {
-    const Outcome outcome = run();
-    EXPECT_THAT(pairsOf(outcome), ElementsAre("plain > plain"));
-    EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
-  }
-  for (const Path& source : {settingPath("plain"), ipAssignmentPath("plain")}) {
-    for (const Operation& run : allFrom(source)) {
-      const Outcome outcome = run();
-      EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "not done, not marked", kMalformed));
-      EXPECT_EQ(0U, handedOut(outcome));
-    }
   }
 }
 

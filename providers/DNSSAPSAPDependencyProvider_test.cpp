@@ -1,4 +1,3 @@
-#include "factory/DNSClientObjFactory.h"
 #include "providers/testing/AssociationTestSupport.h"
 
 extern "C" CMPIInstanceMI* DNSSAPSAPDependencyProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*,
@@ -7,24 +6,6 @@ extern "C" CMPIAssociationMI* DNSSAPSAPDependencyProvider_Create_AssociationMI(c
                                                                                CMPIStatus*);
 
 namespace ZV::Test {
-
-// The linker puts a function of this file in the place of the factory's look-up (--wrap).
-#define ZV_LOOK_UP                                                                                             \
-  "_ZN2ZV19DNSClientObjFactory39getDNSClientCMPIInstanceFromIPInterfaceEPK11_CMPIBrokerPK15_CMPIObjectPathRKN" \
-  "St7__cxx1112basic_stringIcSt11char_traitsIcESaIcEEERP13_CMPIInstancebPPKcP11_CMPIStatus"
-using LookUp = unsigned short(DNSClientObjFactory*, const CMPIBroker*, const CMPIObjectPath*, const std::string&,
-                              CMPIInstance*&, bool, const char**, CMPIStatus*);
-LookUp realLookUp __asm__("__real_" ZV_LOOK_UP);
-LookUp wrappedLookUp __asm__("__wrap_" ZV_LOOK_UP);
-
-static unsigned short lookUpAnswers = 0;
-
-unsigned short wrappedLookUp(DNSClientObjFactory* factory, const CMPIBroker* broker, const CMPIObjectPath* ref,
-                             const std::string& name, CMPIInstance*& instance, bool isObjPath, const char** properties,
-                             CMPIStatus* rc) {
-  realLookUp(factory, broker, ref, name, instance, isObjPath, properties, rc);
-  return lookUpAnswers;
-}
 
 namespace {
 
@@ -165,24 +146,6 @@ TEST_F(SAPSAPDependency, IpEndpointWithoutANameOrWithOneThatIsNoTextMatchesNothi
     EXPECT_EQ(0U, outcome.instances().size() + outcome.paths().size());
     EXPECT_THAT(complaintsOf(outcome), IsEmpty());
   }
-}
-
-TEST_F(SAPSAPDependency, ALookUpThatFailsEndsTheWalk) {
-  install({"eth0"}, {"eth0"});
-  lookUpAnswers = 1;
-  const std::vector<Outcome> outcomes = {enumerateInstanceNames(), associators(ipEndpointPath("eth0")),
-                                         associatorNames(ipEndpointPath("eth0"))};
-  const Outcome built = enumerateInstances();
-  lookUpAnswers = 0;
-
-  for (const Outcome& outcome : outcomes) {
-    EXPECT_THAT(complaintsOf(outcome), ElementsAre("getDNSClientCMPIInstanceFromIPInterface Failed"));
-    EXPECT_EQ("not done, not marked", endOf(outcome).at(1));
-    EXPECT_EQ(0U, outcome.instances().size() + outcome.paths().size());
-  }
-  EXPECT_THAT(complaintsOf(built), ElementsAre("getDNSClientCMPIInstanceFromIPInterface Failed"));
-  EXPECT_EQ("done, marked", endOf(built).at(1));
-  EXPECT_THAT(built.instances(), IsEmpty());
 }
 
 TEST_F(SAPSAPDependency, SourceWithoutANameMatchesNothing) {

@@ -301,18 +301,6 @@ TEST_P(SettingAssociation, NamespaceOfEnumerationsIsThatOfTheClass) {
   }
 }
 
-TEST_P(SettingAssociation, ObjectsAreCountedInSixteenBits) {
-  FetchHook hook;
-  hook.generalSettingPaths = hook.settingPaths = [](std::vector<CMPIObjectPath*>& paths) {
-    paths.assign(65536 + 2, paths.at(0));
-    return 0;
-  };
-  const Path& source = association.left.path;
-  EXPECT_THAT(associatorNames(source).paths(), SizeIs(2));
-  EXPECT_THAT(references(source).instances(), SizeIs(2));
-  EXPECT_THAT(referenceNames(source).paths(), SizeIs(2));
-}
-
 // --- Enumerations and single instances
 
 TEST_P(SettingAssociation, EveryPairHasANameAndAnInstance) {

@@ -1,5 +1,4 @@
-// The four associations of DNS settings as their tests share them: who they are, and what a host no test can write down
-// would make of the fetches below them.
+// The four associations of DNS settings as their tests share them.
 #pragma once
 
 #include <functional>
@@ -114,23 +113,6 @@ inline Story returnedPath(const std::string& instance, const std::string& path) 
 }
 
 inline Story done(const std::string& operation) { return tell({{"returnDone()"}, exitMark(operation)}); }
-
-// --- Fetches.
-
-// As long as it lives, it may change what a fetch of settings gave, and what the fetch answers: for answers that the
-// real ones never give. What is not set leaves its fetch alone. One at a time.
-class FetchHook {
- public:
-  FetchHook();
-  ~FetchHook();
-  FetchHook(const FetchHook&) = delete;
-  FetchHook& operator=(const FetchHook&) = delete;
-
-  std::function<unsigned short(std::vector<CMPIObjectPath*>&)> generalSettingPaths;
-  std::function<unsigned short(std::vector<CMPIObjectPath*>&)> settingPaths;
-  std::function<unsigned short(std::vector<CMPIInstance*>&)> generalSettings;
-  std::function<unsigned short(std::vector<CMPIInstance*>&)> settings;
-};
 
 // --- The fixture.
 
