@@ -391,8 +391,7 @@ TEST_F(BrokerTest, RefusesParametersThatDoNotFitOrAreMissing) {
   };
   EXPECT_EQ(call("Echo", {{"Times", Value::text("many")}}), "4 Echo.Times: \"many\" is no uint16");
   EXPECT_EQ(call("Echo", {{"Text", Value::unsignedNumber(5)}}), "4 Echo.Text: 5 is no string");
-  EXPECT_EQ(call("Echo", {{"Text", Value::textArray({"a"})}}),
-            "4 Echo.Text: an array where one value is declared");
+  EXPECT_EQ(call("Echo", {{"Text", Value::textArray({"a"})}}), "4 Echo.Text: an array where one value is declared");
   EXPECT_EQ(call("Echo", {{"Text", Value::text("a")}, {"TEXT", Value::text("b")}}),
             "4 Echo: the parameter TEXT is there twice");
   EXPECT_EQ(call("Call", {}), "4 Call: the parameter Text is missing");

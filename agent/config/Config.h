@@ -37,7 +37,7 @@ struct Config {
 
   // [agent]
   std::string dataDir = kDefaultDataDir;  // ends in a slash
-  std::string systemName;                       // empty: the name that the tree's source tells
+  std::string systemName;                 // empty: the name that the tree's source tells
   std::string language = "en";
 
   // [tree]
