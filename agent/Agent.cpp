@@ -6,7 +6,7 @@
 #include "agent/log/LogOutput.h"
 #include "agent/tree/TreeJson.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 using ZV::NodeLexicon::PROP_NAME;
@@ -83,4 +83,4 @@ std::size_t clearOverlay(const std::optional<std::string>& interface) {
   return cleared;
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -13,7 +13,7 @@
 #include "agent/tree/TreeSnapshot.h"
 
 // All functions are thread-safe. Texts are bytes as the host gives them, UTF-8 by convention.
-namespace zorvagent {
+namespace zorva::agent {
 
 // Reads and checks the configuration: that file, or the one that the environment asks for where the path is empty. It
 // holds in the whole process from now on. Throws ConfigError, and what held before stays.
@@ -66,4 +66,4 @@ ZORVA_AGENT_API std::vector<OverlayEntry> overlayEntries();
 // ConfigError where the file is wrong, std::runtime_error, with one line, where it cannot be written.
 ZORVA_AGENT_API std::size_t clearOverlay(const std::optional<std::string>& interface = std::nullopt);
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -20,7 +20,7 @@
 #include "agent/interface/PlatformUtilities.h"
 #include "agent/testing/TemporaryDirectory.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 using testing::contentsOf;
@@ -207,7 +207,7 @@ TEST(AgentLibrary, IsLoadedAndUnloadedAHundredTimesAndReallyGone) {
     void* handle = ::dlopen(library().c_str(), RTLD_NOW | RTLD_LOCAL);
     ASSERT_NE(handle, nullptr) << ::dlerror();
     using CurrentTree = std::shared_ptr<const TreeSnapshot> (*)();
-    const auto readTree = reinterpret_cast<CurrentTree>(::dlsym(handle, "_ZN9zorvagent11currentTreeEv"));
+    const auto readTree = reinterpret_cast<CurrentTree>(::dlsym(handle, "_ZN5zorva5agent11currentTreeEv"));
     ASSERT_NE(readTree, nullptr);
     EXPECT_NE(readTree(), nullptr) << "sockets, watches and the process's state are made, and must go with the library";
     ASSERT_EQ(::dlclose(handle), 0);
@@ -231,7 +231,7 @@ std::vector<std::string> linesOf(const std::string& command) {
 TEST(AgentLibrary, ExportsItsInterfacesAndNothingElse) {
   const auto symbols = linesOf("nm -DC --defined-only '" + library() + "'");
   EXPECT_GT(symbols.size(), 50U);
-  const std::regex own("[0-9a-f]+ [A-Z] ((typeinfo|typeinfo name|vtable) for )?(ZV|ZALog|zorvagent)::.*\n");
+  const std::regex own("[0-9a-f]+ [A-Z] ((typeinfo|typeinfo name|vtable) for )?(ZV|ZALog|zorva)::.*\n");
   for (const std::string& symbol : symbols) EXPECT_TRUE(std::regex_match(symbol, own)) << symbol;
 }
 
@@ -245,4 +245,4 @@ TEST(AgentLibrary, AForkAfterItIsUnloadedWorks) {
 }
 
 }  // namespace
-}  // namespace zorvagent
+}  // namespace zorva::agent

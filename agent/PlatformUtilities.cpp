@@ -4,8 +4,10 @@
 
 namespace ZV {
 
-const char* PlatformUtilities::getMaroviaDataDir() { return zorvagent::Runtime::instance().config().dataDir.c_str(); }
+const char* PlatformUtilities::getMaroviaDataDir() {
+  return zorva::agent::Runtime::instance().config().dataDir.c_str();
+}
 
-std::string getSystemName() { return zorvagent::Runtime::instance().systemName(); }
+std::string getSystemName() { return zorva::agent::Runtime::instance().systemName(); }
 
 }  // namespace ZV

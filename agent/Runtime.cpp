@@ -13,7 +13,7 @@
 #include "agent/sources/FileSource.h"
 #include "agent/sources/HostSource.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 std::shared_ptr<TreeSource> makeSource(const Config& config) {
@@ -260,4 +260,4 @@ void reset() {
   Runtime::instance().reset();
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

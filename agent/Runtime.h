@@ -15,7 +15,7 @@
 #include "agent/tree/TreeSnapshot.h"
 #include "agent/tree/TreeSource.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // One for the process, made when it is first asked for, ended when the library is unloaded. Thread-safe. A fork waits
 // until nobody is inside, so that the child finds it whole.
@@ -96,4 +96,4 @@ class Runtime {
   std::shared_ptr<const TreeSnapshot> latest_;
 };
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

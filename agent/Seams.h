@@ -9,7 +9,7 @@
 #include "agent/log/LogSink.h"
 #include "agent/tree/TreeSource.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // Reads the tree from this source from now on, in place of the configured one; null goes back to that. Snapshots that
 // cursors stand in stay theirs. The overlay of the data directory holds over it as over any source. Thread-safe.
@@ -51,4 +51,4 @@ ZORVA_AGENT_API void setTreeCallHook(TreeCallHook* hook);
 // a new process. Cursors that exist stay valid.
 ZORVA_AGENT_API void reset();
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -16,7 +16,7 @@
 #include "agent/files/Rewrite.h"
 #include "agent/log/LogOutput.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 constexpr const char* kLockName = "settings.lock";
@@ -233,4 +233,4 @@ void SettingsLock::keepAside(const std::string& interface) { core_->keepAside(in
 
 std::string SettingsLock::finish() { return core_ == nullptr ? std::string() : core_->finish(); }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

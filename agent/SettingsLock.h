@@ -6,7 +6,7 @@
 
 #include "agent/interface/AgentApi.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 enum class Access { Read, Change };
 
@@ -43,4 +43,4 @@ class ZORVA_AGENT_API SettingsLock {
   std::unique_ptr<Core> core_;  // null: reads without a lock
 };
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

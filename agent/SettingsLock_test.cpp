@@ -16,7 +16,7 @@
 #include "agent/files/FileLock.h"
 #include "agent/testing/TemporaryDirectory.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 using testing::contentsOf;
@@ -231,4 +231,4 @@ TEST(SettingsLock, AFileBehindALinkIsPutBackWhereItIs) {
 }
 
 }  // namespace
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -53,7 +53,7 @@ class BenchHost {
     tree.close();
     std::ofstream(directory_ / "agent.toml")
         << "[agent]\ndata_dir = \"data/\"\n[tree]\nsource = \"file\"\nfile = \"tree.json\"\n[log]\ntarget = \"off\"\n";
-    zorvagent::loadConfig((directory_ / "agent.toml").string());
+    zorva::agent::loadConfig((directory_ / "agent.toml").string());
   }
 
  private:

@@ -4,11 +4,11 @@
 #include <exception>
 #include <utility>
 
-#include "broker/BrokerCore.h"
-#include "broker/ControlCharacters.h"
-#include "broker/Convert.h"
-#include "broker/Data.h"
-#include "broker/Request.h"
+#include "broker/core/BrokerCore.h"
+#include "broker/objects/Convert.h"
+#include "broker/objects/Data.h"
+#include "broker/requests/ControlCharacters.h"
+#include "broker/requests/Request.h"
 
 namespace zorva::broker {
 

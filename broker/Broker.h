@@ -1,14 +1,14 @@
 #pragma once
 
-#include <functional>
 #include <memory>
 #include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
-#include "broker/ProviderRegistry.h"
-#include "broker/Value.h"
+#include "broker/core/BrokerOptions.h"
+#include "broker/objects/Value.h"
+#include "broker/requests/Operations.h"
 #include "schema/ClassRepository.h"
 
 // A CMPI 2.0 broker in this process: it loads providers, asks them what a client asks, and is what they call back to.
@@ -28,91 +28,6 @@ struct _CMPIBroker;
 namespace zorva::broker {
 
 class BrokerCore;
-
-enum class LogLevel { Debug, Info, Warning, Error };
-
-/// Takes one line of the broker's or, through the broker, of a provider's log.
-using LogHook = std::function<void(LogLevel level, std::string_view text)>;
-
-/// What a request does to what other processes use as well.
-enum class Access { Read, Change };
-
-/// What a request holds while its provider reads or changes such things, so that others keep away from them.
-class Claim {
- public:
-  virtual ~Claim() = default;
-  /// Asked after a change has been made: a failure that the provider did not notice.
-  virtual Status finish() { return {}; }
-};
-
-/// Asked for a claim before a provider of that class is called; null: the class needs none. `changed` is the path of
-/// what is to be changed, null for Access::Read. What it throws ends the request. Of a read the claim goes when the
-/// provider returns its first result, or ends: it has read all by then, and a slow client must not hold up others.
-/// Requests of a provider within one that has a claim do without. Called on any thread.
-using ClaimHook =
-    std::function<std::unique_ptr<Claim>(Access access, std::string_view className, const ObjectPath* changed)>;
-
-/// A create function (CMPI 2.0) of a provider that is part of the program: "<prefix>_Create_InstanceMI" and so on.
-struct LinkedFunction {
-  std::string name;
-  void (*function)();  ///< cast from its own type
-};
-
-struct BrokerOptions {
-  ProviderRegistry registry = ProviderRegistry::builtIn();
-  std::vector<LinkedFunction> linked = {};  ///< for the entries of the registry that name no library
-  std::string providerDirectory =
-      {};                ///< where libraries named without "/" lie; empty: the dynamic loader's own search
-  LogHook log = {};      ///< may be empty
-  ClaimHook claim = {};  ///< may be empty
-};
-
-/// What the providers learn of the client, as entries of the CMPI context. Empty texts make no entry.
-struct Caller {
-  std::string principal;
-  std::string role;
-  std::string acceptLanguage;
-  std::string contentLanguage;
-};
-
-/// What of each instance is wanted (DSP0200 5.3.2.2, 5.3.2.11). Qualifiers and class origins are added by who writes
-/// the answer, from Property::declaration; here they are only told to the provider.
-struct Selection {
-  bool localOnly = false;
-  bool deepInheritance = true;
-  bool includeQualifiers = false;
-  bool includeClassOrigin = false;
-  /// Absent: all properties. Names that the class lacks are passed over. Keys come only if they are named; the path of
-  /// the instance has them all the same.
-  std::optional<std::vector<std::string>> propertyList;
-};
-
-/// Which associations and far ends are wanted; empty texts stand for what is omitted. For references,
-/// `associationClass` is the operation's ResultClass, and `resultClass` and `resultRole` are not used.
-struct AssociationFilter {
-  std::string associationClass;
-  std::string resultClass;
-  std::string role;
-  std::string resultRole;
-};
-
-/// Takes results one by one while the provider makes them. What is referred to is the broker's and holds until the sink
-/// returns: copy what is to be kept. false: no more are wanted; the operation then ends as soon as the provider does.
-using InstanceSink = std::function<bool(const Instance& instance)>;
-using PathSink = std::function<bool(const ObjectPath& path)>;
-
-/// What a method gave back.
-struct MethodResult {
-  Value returnValue;               ///< null where the provider returned none
-  std::vector<NamedValue> output;  ///< in the order in which the provider set them
-};
-
-/// What a modification was to change, and what came of it: providers may say success and have stored nothing.
-struct ModificationEffect {
-  std::vector<Property> changes;  ///< what the provider was asked to change, in the types that the schema declares
-  Status reading;                 ///< of reading the instance again, under the same claim; only after a success
-  Instance now;                   ///< where that was a success, and there were changes
-};
 
 class Broker {
  public:
@@ -188,7 +103,7 @@ class Broker {
   Status canonicalPath(const ObjectPath& path, ObjectPath& canonical) const;
 
   /// The broker as providers see it, for what speaks CMPI itself. CMPI objects can be made only while a Scope is open
-  /// on the thread (broker/Scope.h).
+  /// on the thread (broker/objects/Scope.h).
   const _CMPIBroker* handle() const noexcept;
 
  private:

@@ -7,7 +7,7 @@
 #include <mutex>
 #include <thread>
 
-#include "broker/PathText.h"
+#include "broker/objects/PathText.h"
 #include "broker/testing/TestClasses.h"
 
 namespace zorva::broker {

@@ -10,11 +10,11 @@
 #include <vector>
 
 #include "broker/Broker.h"
-#include "broker/BrokerCore.h"
-#include "broker/Data.h"
-#include "broker/Request.h"
-#include "broker/Result.h"
-#include "broker/Scope.h"
+#include "broker/core/BrokerCore.h"
+#include "broker/objects/Data.h"
+#include "broker/objects/Scope.h"
+#include "broker/requests/Request.h"
+#include "broker/requests/Result.h"
 #include "broker/testing/TestClasses.h"
 
 // What the broker offers providers that run threads of their own: CMPIBrokerExtFT, and attaching.

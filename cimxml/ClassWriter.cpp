@@ -2,7 +2,7 @@
 
 #include <algorithm>
 
-#include "broker/Value.h"
+#include "broker/objects/Value.h"
 #include "cimxml/ElementWriter.h"
 
 namespace zorva::cimxml {

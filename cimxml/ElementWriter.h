@@ -3,7 +3,7 @@
 #include <string>
 #include <string_view>
 
-#include "broker/Value.h"
+#include "broker/objects/Value.h"
 
 // CIM values, names and instances as elements of CIM-XML (DSP0201 2.4, DTD DSP0203 2.4.0).
 //

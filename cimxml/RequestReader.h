@@ -7,7 +7,7 @@
 #include <variant>
 #include <vector>
 
-#include "broker/Value.h"
+#include "broker/objects/Value.h"
 #include "cimxml/XmlCheck.h"
 
 // CIM-XML requests (DSP0201 2.4, operations of DSP0200 1.4) as plain values.

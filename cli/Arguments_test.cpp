@@ -167,7 +167,7 @@ std::vector<std::vector<std::string>> calls() {
 }
 
 TEST(ManualPage, HasEverySubcommandAndOption) {
-  std::string page = zorvagent::testing::contentsOf(ZORVA_SOURCE_DIR "/cli/zorvactl.1");
+  std::string page = zorva::agent::testing::contentsOf(ZORVA_SOURCE_DIR "/cli/zorvactl.1");
   for (std::size_t at = page.find("\\-"); at != std::string::npos; at = page.find("\\-")) page.replace(at, 2, "-");
   EXPECT_EQ(calls().size(), 31U);
   for (const std::vector<std::string>& call : calls()) {

@@ -4,7 +4,7 @@
 #include <string_view>
 #include <vector>
 
-#include "broker/Value.h"
+#include "broker/objects/Value.h"
 
 // name=value words of the command line, with the types that the schema declares.
 

@@ -3,7 +3,7 @@
 #include <string>
 #include <vector>
 
-#include "broker/Value.h"
+#include "broker/objects/Value.h"
 #include "cli/Session.h"
 
 // Changes of instances, by ModifyInstance, as a person needs them: one setting changes and the others stay, and what

@@ -17,7 +17,7 @@ using testing::AllOf;
 using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::Not;
-using zorvagent::testing::contentsOf;
+using zorva::agent::testing::contentsOf;
 
 using Words = std::vector<std::string>;
 

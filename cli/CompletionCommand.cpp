@@ -81,7 +81,7 @@ void addNamesOf(const schema::ClassRepository& classes, const std::vector<std::s
 
 void addInterfaces(const Arguments& arguments, std::vector<std::string>& words) {
   const Session session(arguments);
-  for (const zorvagent::Node& node : session.tree()->nodes()) {
+  for (const zorva::agent::Node& node : session.tree()->nodes()) {
     const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
     if (name != nullptr) words.push_back(*name);
   }

@@ -5,7 +5,7 @@
 #include <string_view>
 #include <utility>
 
-#include "broker/Value.h"
+#include "broker/objects/Value.h"
 
 // How a command ends when it cannot do what it was asked.
 

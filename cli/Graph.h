@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "broker/Value.h"
+#include "broker/objects/Value.h"
 #include "cli/Progress.h"
 #include "cli/Session.h"
 

@@ -49,17 +49,17 @@ EndpointRow endpointRow(const broker::Instance& instance) {
 
 bool fileStands(const std::string& interface) {
   struct stat status {};
-  return ::stat((zorvagent::dataDirectory() + "ifcfg-" + interface).c_str(), &status) == 0;
+  return ::stat((zorva::agent::dataDirectory() + "ifcfg-" + interface).c_str(), &status) == 0;
 }
 
 /// A setting that the providers read from a file or the host.
 struct SettingName {
   const char* property;
   bool isList;
-  zorvagent::PropertyNumber number;  ///< of the host's value; kNoNumber: it has no place but the file
+  zorva::agent::PropertyNumber number;  ///< of the host's value; kNoNumber: it has no place but the file
 };
 
-constexpr zorvagent::PropertyNumber kNoNumber = 0;
+constexpr zorva::agent::PropertyNumber kNoNumber = 0;
 
 constexpr SettingName kInterfaceSettings[] = {
     {"RequestedHostname", false, ZV::NodeLexicon::PROP_HOST_NAME},
@@ -75,37 +75,37 @@ constexpr SettingName kHostSettings[] = {
 /// Where the settings of an interface come from.
 struct Origin {
   std::string interface;
-  const zorvagent::Node* node = nullptr;  ///< null: it is not in the tree
+  const zorva::agent::Node* node = nullptr;  ///< null: it is not in the tree
 };
 
 /// The file alone decides: where it stands, a key that it lacks is an empty value and not the host's.
-SettingSource sourceOf(const Origin& origin, zorvagent::PropertyNumber number, bool hasValue) {
+SettingSource sourceOf(const Origin& origin, zorva::agent::PropertyNumber number, bool hasValue) {
   if (fileStands(origin.interface)) return SettingSource::File;
   if (number == kNoNumber || !hasValue) return SettingSource::None;
-  const zorvagent::Property* property = origin.node == nullptr ? nullptr : origin.node->find(number);
+  const zorva::agent::Property* property = origin.node == nullptr ? nullptr : origin.node->find(number);
   return property != nullptr && property->overlaid ? SettingSource::Set : SettingSource::Host;
 }
 
 /// The configurations of a tree by the names of their interfaces; of several with one name the first.
 class Configurations {
  public:
-  explicit Configurations(const zorvagent::TreeSnapshot& tree) {
-    for (const zorvagent::Node& node : tree.nodes()) {
+  explicit Configurations(const zorva::agent::TreeSnapshot& tree) {
+    for (const zorva::agent::Node& node : tree.nodes()) {
       const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
-      if (node.type() != zorvagent::NodeType::NetworkIPConfig || name == nullptr) continue;
+      if (node.type() != zorva::agent::NodeType::NetworkIPConfig || name == nullptr) continue;
       const bool isServiceProcessor = tree.parent(tree.parent(node)).description() == "BMC";
       byName_.try_emplace({isServiceProcessor, *name}, &node);
     }
   }
 
   /// Null where there is none.
-  const zorvagent::Node* find(const std::string& interface, bool isServiceProcessor) const {
+  const zorva::agent::Node* find(const std::string& interface, bool isServiceProcessor) const {
     const auto found = byName_.find({isServiceProcessor, interface});
     return found == byName_.end() ? nullptr : found->second;
   }
 
  private:
-  std::map<std::pair<bool, std::string_view>, const zorvagent::Node*> byName_;
+  std::map<std::pair<bool, std::string_view>, const zorva::agent::Node*> byName_;
 };
 
 template <std::size_t Size>
@@ -165,7 +165,7 @@ void readSettings(Session& session, HostView& view) {
 /// A server's host is what its computer systems say, the host itself first and not its service processor.
 std::string systemNameOf(Session& session, HostView& view) {
   if (!session.isRemote()) {
-    const std::string& configured = zorvagent::currentConfig().systemName;
+    const std::string& configured = zorva::agent::currentConfig().systemName;
     return configured.empty() ? session.tree()->systemName() : configured;
   }
   for (const broker::Instance& instance : askedFor(session, kSystemClass, view)) {

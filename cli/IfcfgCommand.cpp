@@ -33,8 +33,8 @@ std::string settingTable(const std::vector<SettingLine>& lines, const Layout& la
 
 /// A fresh installation has no data directory yet. One of another name that is missing is more likely misspelt.
 void makeDefaultDirectory() {
-  const std::string directory = zorvagent::dataDirectory();
-  if (directory != zorvagent::kDefaultDataDir || ::geteuid() != 0) return;
+  const std::string directory = zorva::agent::dataDirectory();
+  if (directory != zorva::agent::kDefaultDataDir || ::geteuid() != 0) return;
   if (::mkdir(directory.c_str(), 0755) == 0 || errno == EEXIST) return;
   throw Failure(ExitCode::Failed, directory + ": cannot be made: " + std::strerror(errno));
 }

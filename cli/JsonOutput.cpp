@@ -2,7 +2,7 @@
 
 #include <nlohmann/json.hpp>
 
-#include "broker/PathText.h"
+#include "broker/objects/PathText.h"
 #include "cli/Text.h"
 #include "cli/ValueText.h"
 

@@ -24,8 +24,8 @@ std::string printedInNewNetwork(const TestHost& host, const std::string& script)
                                            " Z=" ZORVA_BIN_DIR "/zorvactl\n" + script);
   const std::string output = host.directory() / "output";
   EXPECT_EQ(std::system(("unshare -rn sh -e " + file + " >" + output + " 2>&1").c_str()), 0)
-      << zorvagent::testing::contentsOf(output);
-  return zorvagent::testing::contentsOf(output);
+      << zorva::agent::testing::contentsOf(output);
+  return zorva::agent::testing::contentsOf(output);
 }
 
 TEST(LiveHost, CanBeShown) {
@@ -63,7 +63,7 @@ TEST(LiveHost, GivesSettingsAFileAndChangesThem) {
                           "$Z domain zv0 lab.example.org\n"
                           "$Z ai 'ZORVA_DNSProtocolEndPoint.Name=\"zv0\"' --result-class ZORVA_IPProtocolEndpoint\n");
   EXPECT_THAT(printed, AllOf(HasSubstr("192.0.2.7"), Not(HasSubstr("warning"))));
-  const std::string file = zorvagent::testing::contentsOf(host.directory() / "ifcfg-zv0");
+  const std::string file = zorva::agent::testing::contentsOf(host.directory() / "ifcfg-zv0");
   EXPECT_THAT(file, AllOf(HasSubstr("BOOTPROTO=static\n"), HasSubstr("DNSSERVERS=192.0.2.1 \n"),
                           HasSubstr("DOMAINNAME=lab.example.org\n")));
 }

@@ -17,9 +17,9 @@ namespace {
 using nlohmann::json;
 using testing::AllOf;
 using testing::HasSubstr;
-using zorvagent::testing::contentsOf;
-using zorvagent::testing::startChild;
-using zorvagent::testing::succeeded;
+using zorva::agent::testing::contentsOf;
+using zorva::agent::testing::startChild;
+using zorva::agent::testing::succeeded;
 
 using Words = std::vector<std::string>;
 
@@ -162,7 +162,7 @@ TEST_F(Killed, WhoMayNotWriteReadsWhatThereIs) {
 }
 
 TEST_F(Locking, WhoMayNotWriteReadsWhileOthersChange) {
-  const zorvagent::SettingsLock change(host_.dataFile(""), zorvagent::Access::Change);
+  const zorva::agent::SettingsLock change(host_.dataFile(""), zorva::agent::Access::Change);
   const Outcome outcome = host_.runAsNobody({"gi", kSetting});
   if (outcome.exitCode == 127) GTEST_SKIP() << "another user cannot run what was built here";
   EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
@@ -170,7 +170,7 @@ TEST_F(Locking, WhoMayNotWriteReadsWhileOthersChange) {
 }
 
 TEST_F(Locking, WhatReadsNoFileDoesNotWait) {
-  const zorvagent::SettingsLock change(host_.dataFile(""), zorvagent::Access::Change);
+  const zorva::agent::SettingsLock change(host_.dataFile(""), zorva::agent::Access::Change);
   EXPECT_TRUE(runs({"ei", "ZORVA_DNSProtocolEndPoint"}));
 }
 

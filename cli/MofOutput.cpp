@@ -1,6 +1,6 @@
 #include "cli/MofOutput.h"
 
-#include "broker/PathText.h"
+#include "broker/objects/PathText.h"
 #include "cli/Text.h"
 #include "schema/Mof.h"
 

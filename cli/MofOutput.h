@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "broker/Value.h"
+#include "broker/objects/Value.h"
 
 namespace zorva::cli {
 

@@ -81,10 +81,10 @@ TEST(MofOutput, IsReadBackAsTheSameInstance) {
 }
 
 TEST(TreeText, MarksAValueThatWasSet) {
-  zorvagent::TreeBuilder builder("h");
-  const std::size_t system = builder.add(0, zorvagent::NodeType::System, "system", "BMC");
-  const std::size_t port = builder.add(system, zorvagent::NodeType::Port, "e\x1Bth");
-  const std::size_t node = builder.add(port, zorvagent::NodeType::NetworkIPConfig, "ip");
+  zorva::agent::TreeBuilder builder("h");
+  const std::size_t system = builder.add(0, zorva::agent::NodeType::System, "system", "BMC");
+  const std::size_t port = builder.add(system, zorva::agent::NodeType::Port, "e\x1Bth");
+  const std::size_t node = builder.add(port, zorva::agent::NodeType::NetworkIPConfig, "ip");
   builder.set(node, ZV::NodeLexicon::PROP_NAME, std::string("eth"));
   builder.set(node, ZV::NodeLexicon::PROP_DOMAIN_NAME, std::string("set.example"), true);
   EXPECT_EQ(treeText(*builder.finish(), {}),

@@ -17,9 +17,9 @@ void showOverlay(const Arguments& arguments) {
   requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "overlay show");
   requireLocal(arguments, "overlay show");
   const Session session(arguments);
-  const std::vector<zorvagent::OverlayEntry> entries = asFailure([] { return zorvagent::overlayEntries(); });
+  const std::vector<zorva::agent::OverlayEntry> entries = asFailure([] { return zorva::agent::overlayEntries(); });
   std::vector<OverlayRow> rows;
-  for (const zorvagent::OverlayEntry& entry : entries) {
+  for (const zorva::agent::OverlayEntry& entry : entries) {
     rows.push_back(
         {entry.path, entry.propertyName, valueTexts(entry.value), !std::holds_alternative<std::string>(entry.value)});
   }
@@ -41,7 +41,7 @@ void clearOverlay(const Arguments& arguments) {
   requireLocal(arguments, "overlay clear");
   const Session session(arguments);
   const auto interface = arguments.target.empty() ? std::nullopt : std::optional(arguments.target);
-  const std::size_t cleared = asFailure([&interface] { return zorvagent::clearOverlay(interface); });
+  const std::size_t cleared = asFailure([&interface] { return zorva::agent::clearOverlay(interface); });
   if (cleared == 0 && interface) {
     throw Failure(ExitCode::Failed, "no value is set for " + printable(*interface),
                   "zorvactl overlay show lists those that are");

@@ -2,7 +2,7 @@
 
 #include <algorithm>
 
-#include "broker/PathText.h"
+#include "broker/objects/PathText.h"
 #include "cli/Failure.h"
 #include "cli/Text.h"
 #include "schema/Names.h"

@@ -4,7 +4,7 @@
 #include <string_view>
 #include <vector>
 
-#include "broker/Value.h"
+#include "broker/objects/Value.h"
 #include "cli/Session.h"
 
 // Object paths as a person types them: any spelling of names, keys left out where the rest is clear.

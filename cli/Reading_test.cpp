@@ -565,7 +565,7 @@ TEST(CompletionScript, PutsTogetherTheWordsThatBashTookApart) {
 
 TEST(CompletionScript, IsTheOneThatIsInstalled) {
   EXPECT_EQ(shown(TestHost(), {"completion", "bash"}),
-            zorvagent::testing::contentsOf(ZORVA_SOURCE_DIR "/cli/zorvactl.bash"));
+            zorva::agent::testing::contentsOf(ZORVA_SOURCE_DIR "/cli/zorvactl.bash"));
 }
 
 TEST(CompletionScript, WorksInBash) {

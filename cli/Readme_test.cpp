@@ -10,7 +10,7 @@ namespace zorva::cli {
 namespace {
 
 using testing::HasSubstr;
-using zorvagent::testing::contentsOf;
+using zorva::agent::testing::contentsOf;
 
 std::string readme() { return contentsOf(ZORVA_SOURCE_DIR "/README.md"); }
 

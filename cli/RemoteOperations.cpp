@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <charconv>
 
-#include "broker/PathText.h"
+#include "broker/objects/PathText.h"
 #include "cli/Failure.h"
 #include "cli/RequestText.h"
 #include "cli/Text.h"

@@ -17,7 +17,7 @@ using testing::AllOf;
 using testing::HasSubstr;
 using testing::Not;
 using testing::StartsWith;
-using zorvagent::testing::contentsOf;
+using zorva::agent::testing::contentsOf;
 
 using Words = std::vector<std::string>;
 

@@ -3,7 +3,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "broker/PathText.h"
+#include "broker/objects/PathText.h"
 #include "cli/Failure.h"
 #include "schema/Schema.h"
 

@@ -2,7 +2,7 @@
 
 #include <memory>
 
-#include "broker/Value.h"
+#include "broker/objects/Value.h"
 #include "cli/Arguments.h"
 #include "cli/Table.h"
 

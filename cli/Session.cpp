@@ -44,9 +44,9 @@ void tell(const char* kind, std::string_view what) {
 }
 
 /// Passes over what the providers log, and tells the agent's own lines.
-class QuietLog : public zorvagent::LogSink {
+class QuietLog : public zorva::agent::LogSink {
  public:
-  void record(const zorvagent::LogCall& /*call*/) override {}
+  void record(const zorva::agent::LogCall& /*call*/) override {}
   void recordOwn(int level, const std::string& message) override {
     if (level >= 5000) tellWarning(printable(message));
   }
@@ -55,10 +55,10 @@ class QuietLog : public zorvagent::LogSink {
 QuietLog quietLog;
 
 /// Keeps the agent's own lines until it is known what becomes of the call.
-class HeldBackLog : public zorvagent::LogSink {
+class HeldBackLog : public zorva::agent::LogSink {
  public:
   explicit HeldBackLog(int level) : level_(level) {}
-  void record(const zorvagent::LogCall& call) override { recordOwn(call.level, call.message); }
+  void record(const zorva::agent::LogCall& call) override { recordOwn(call.level, call.message); }
   void recordOwn(int level, const std::string& message) override {
     if (level >= level_) lines_.push_back(message);
   }
@@ -93,9 +93,9 @@ Session::Session(const Arguments& arguments)
       providerDirectory_(arguments.providerDirectory) {
   if (isRemote()) return;
   asFailure([&] {
-    zorvagent::loadConfig(arguments.config);
-    if (arguments.logLevel) zorvagent::setLogLevel(zorvagent::LogStream::Log, *arguments.logLevel);
-    if (!arguments.logLevel) logLevel_ = zorvagent::currentConfig().logLevel;
+    zorva::agent::loadConfig(arguments.config);
+    if (arguments.logLevel) zorva::agent::setLogLevel(zorva::agent::LogStream::Log, *arguments.logLevel);
+    if (!arguments.logLevel) logLevel_ = zorva::agent::currentConfig().logLevel;
   });
 }
 
@@ -114,13 +114,13 @@ const schema::Class& Session::classNamed(std::string_view name) {
   throw Failure(ExitCode::WrongUsage, "there is no class " + printable(name), similarNames(*classes(), name));
 }
 
-std::shared_ptr<const zorvagent::TreeSnapshot> Session::tree() const {
+std::shared_ptr<const zorva::agent::TreeSnapshot> Session::tree() const {
   // What goes to the terminal anyway is told in this program's words, and a failure that ends it once.
-  const bool holdsBack = zorvagent::currentConfig().logTarget == "stderr";
+  const bool holdsBack = zorva::agent::currentConfig().logTarget == "stderr";
   HeldBackLog log(logLevel_);
-  if (holdsBack) zorvagent::setLogSink(&log);
+  if (holdsBack) zorva::agent::setLogSink(&log);
   const Finally restore([this] { placeLogSink(); });
-  auto tree = asFailure([] { return zorvagent::currentTree(); });
+  auto tree = asFailure([] { return zorva::agent::currentTree(); });
   log.tell();
   return tree;
 }
@@ -146,7 +146,7 @@ Session::Changing::Changing(Session& session, bool isDryRun) : quiet_(session) {
   try {
     hold_.emplace(session.claims_);
   } catch (const std::runtime_error& error) {
-    const bool isMissing = ::access(zorvagent::dataDirectory().c_str(), F_OK) != 0;
+    const bool isMissing = ::access(zorva::agent::dataDirectory().c_str(), F_OK) != 0;
     throw Failure(ExitCode::Failed, "nothing was changed: " + printable(error.what()),
                   isMissing ? "make the data directory, or name another: data_dir in the agent's configuration" : "");
   }
@@ -155,9 +155,9 @@ Session::Changing::Changing(Session& session, bool isDryRun) : quiet_(session) {
 void Session::placeLogSink() const {
   if (isRemote()) return;
   // A sink takes the lines of all targets: a file must not go without them.
-  const zorvagent::Config& config = zorvagent::currentConfig();
+  const zorva::agent::Config& config = zorva::agent::currentConfig();
   const bool isQuietLog = isQuiet() && config.logTarget == "stderr" && config.traceTarget == "off";
-  zorvagent::setLogSink(isQuietLog ? &quietLog : nullptr);
+  zorva::agent::setLogSink(isQuietLog ? &quietLog : nullptr);
 }
 
 Session::Quiet::Quiet(Session& session) : session_(session) {
@@ -183,7 +183,7 @@ void Session::log(broker::LogLevel level, std::string_view text) const {
 
 bool Session::isThisHost(std::string_view name) const {
   return isRemote() || schema::sameName(name, "localhost") || schema::sameName(name, tree()->systemName()) ||
-         schema::sameName(name, zorvagent::currentConfig().systemName);
+         schema::sameName(name, zorva::agent::currentConfig().systemName);
 }
 
 void requireLocal(const Arguments& arguments, const char* subcommand) {

@@ -40,7 +40,7 @@ class Session {
   const std::string& url() const noexcept { return url_; }
 
   /// The tree of the host as it is now. Throws Failure where it, or the file that stands for it, cannot be read.
-  std::shared_ptr<const zorvagent::TreeSnapshot> tree() const;
+  std::shared_ptr<const zorva::agent::TreeSnapshot> tree() const;
 
   /// True where a path with this host in it means the host that is asked; a server judges of that itself.
   bool isThisHost(std::string_view name) const;
@@ -106,7 +106,7 @@ template <class Work>
 auto asFailure(Work work) {
   try {
     return work();
-  } catch (const zorvagent::ConfigError& error) {
+  } catch (const zorva::agent::ConfigError& error) {
     throw Failure(ExitCode::WrongUsage, error.what());
   } catch (const Failure&) {
     throw;

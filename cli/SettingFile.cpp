@@ -84,7 +84,7 @@ void requireLine(const std::string& path, const SettingLine& line) {
   if (isBroken) fail(path, line.key + " would hold control characters: '" + printable(line.value) + "'");
 }
 
-std::string listText(const zorvagent::StringList* list) {
+std::string listText(const zorva::agent::StringList* list) {
   std::string text;
   // As the providers write lists: a blank behind every element.
   if (list != nullptr) {
@@ -95,25 +95,25 @@ std::string listText(const zorvagent::StringList* list) {
 
 std::string textOr(const std::string* text) { return text == nullptr ? std::string() : *text; }
 
-const char* bootProtocol(const zorvagent::AddressList& addresses) {
-  const auto from = [&addresses](zorvagent::AddressOrigin origin) {
+const char* bootProtocol(const zorva::agent::AddressList& addresses) {
+  const auto from = [&addresses](zorva::agent::AddressOrigin origin) {
     return std::any_of(addresses.begin(), addresses.end(),
                        [origin](const auto& each) { return each.origin == origin; });
   };
-  if (from(zorvagent::AddressOrigin::Dhcp)) return "dhcp";
-  return from(zorvagent::AddressOrigin::Static) ? "static" : "none";
+  if (from(zorva::agent::AddressOrigin::Dhcp)) return "dhcp";
+  return from(zorva::agent::AddressOrigin::Static) ? "static" : "none";
 }
 
 }  // namespace
 
-SettingFile::SettingFile(const std::string& interface) : path_(zorvagent::dataDirectory() + "ifcfg-" + interface) {
+SettingFile::SettingFile(const std::string& interface) : path_(zorva::agent::dataDirectory() + "ifcfg-" + interface) {
   if (interface.empty() || interface.find('/') != std::string::npos || interface.find('\0') != std::string::npos) {
     throw Failure(ExitCode::WrongUsage, "'" + printable(interface) + "' cannot be the name of an interface");
   }
 }
 
 std::string SettingFile::contents() const {
-  zorvagent::FileText file = zorvagent::readFile(path_, kLargestFile);
+  zorva::agent::FileText file = zorva::agent::readFile(path_, kLargestFile);
   if (file.error == EINVAL) fail(path_, "is no regular file");
   if (file.error != 0) {
     fail(path_, std::strerror(file.error), file.error == ENOENT ? "zorvactl ifcfg init makes it" : "");
@@ -160,7 +160,7 @@ void SettingFile::write(const std::vector<SettingLine>& lines, bool replaces) co
   syncDirectoryOf(path_);
 }
 
-std::vector<SettingLine> settingsOfHost(const zorvagent::Node& interface) {
+std::vector<SettingLine> settingsOfHost(const zorva::agent::Node& interface) {
   using namespace ZV::NodeLexicon;
   return {{"BOOTPROTO", bootProtocol(interface.addresses())},
           {"HOSTNAME", textOr(interface.text(PROP_HOST_NAME))},
@@ -170,10 +170,10 @@ std::vector<SettingLine> settingsOfHost(const zorvagent::Node& interface) {
           {"DNSSUFFIXES", listText(interface.list(PROP_DNS_SUFFIXES))}};
 }
 
-const zorvagent::Node& interfaceNode(const zorvagent::TreeSnapshot& tree, const std::string& interface) {
+const zorva::agent::Node& interfaceNode(const zorva::agent::TreeSnapshot& tree, const std::string& interface) {
   std::vector<std::string> names;
-  for (const zorvagent::Node& node : tree.nodes()) {
-    if (node.type() != zorvagent::NodeType::NetworkIPConfig) continue;
+  for (const zorva::agent::Node& node : tree.nodes()) {
+    if (node.type() != zorva::agent::NodeType::NetworkIPConfig) continue;
     const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
     if (name != nullptr && *name == interface) return node;
     if (name != nullptr && names.size() < 20) names.push_back(printable(*name));

@@ -46,9 +46,9 @@ class SettingFile {
 };
 
 /// The six keys with what the host says at present of the interface.
-std::vector<SettingLine> settingsOfHost(const zorvagent::Node& interface);
+std::vector<SettingLine> settingsOfHost(const zorva::agent::Node& interface);
 
 /// The configuration of the interface of that name. Throws Failure that lists the names there are.
-const zorvagent::Node& interfaceNode(const zorvagent::TreeSnapshot& tree, const std::string& interface);
+const zorva::agent::Node& interfaceNode(const zorva::agent::TreeSnapshot& tree, const std::string& interface);
 
 }  // namespace zorva::cli

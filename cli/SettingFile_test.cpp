@@ -15,17 +15,17 @@ namespace zorva::cli {
 namespace {
 
 using testing::HasSubstr;
-using zorvagent::testing::contentsOf;
-using zorvagent::testing::TemporaryDirectory;
+using zorva::agent::testing::contentsOf;
+using zorva::agent::testing::TemporaryDirectory;
 
 class SettingFileTest : public testing::Test {
  protected:
   SettingFileTest() {
-    zorvagent::Config config;
+    zorva::agent::Config config;
     config.dataDir = directory_.path();
-    zorvagent::setConfig(config);
+    zorva::agent::setConfig(config);
   }
-  ~SettingFileTest() override { zorvagent::reset(); }
+  ~SettingFileTest() override { zorva::agent::reset(); }
 
   template <class Work>
   static std::string failureOf(Work work) {
@@ -89,9 +89,9 @@ TEST_F(SettingFileTest, ReplacesNothingThatIsNoRegularFile) {
 }
 
 TEST_F(SettingFileTest, NamesADataDirectoryThatIsNotThere) {
-  zorvagent::Config config;
+  zorva::agent::Config config;
   config.dataDir = directory_ / "missing/";
-  zorvagent::setConfig(config);
+  zorva::agent::setConfig(config);
   EXPECT_THAT(failureOf([] {
                 SettingFile("eth0").write({{"A", "1"}}, false);
               }),
@@ -128,7 +128,7 @@ TEST_F(SettingFileTest, RefusesNamesThatLeadElsewhere) {
 }
 
 TEST(SettingsOfHost, SayWhatTheInterfaceSays) {
-  const auto tree = zorvagent::treeFromJson(
+  const auto tree = zorva::agent::treeFromJson(
       R"({"system_name": "h", "nodes": [{"type": "System", "name": "s", "description": "Computer", "children": [
           {"type": "Port", "name": "eth0", "description": "", "children": [
           {"type": "NetworkIPConfig", "name": "ip", "description": "", "properties": {"name": "eth0",

@@ -15,8 +15,8 @@ void showTree(const Arguments& arguments) {
   requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "tree");
   requireLocal(arguments, "tree");
   const Session session(arguments);
-  const std::shared_ptr<const zorvagent::TreeSnapshot> tree = session.tree();
-  write(arguments.output == OutputFormat::Json ? zorvagent::treeToJson(*tree) : treeText(*tree, session.layout()));
+  const std::shared_ptr<const zorva::agent::TreeSnapshot> tree = session.tree();
+  write(arguments.output == OutputFormat::Json ? zorva::agent::treeToJson(*tree) : treeText(*tree, session.layout()));
 }
 
 }  // namespace zorva::cli

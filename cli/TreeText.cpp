@@ -9,13 +9,13 @@ namespace zorva::cli {
 
 namespace {
 
-using zorvagent::Node;
-using zorvagent::NodeType;
-using zorvagent::Property;
-using zorvagent::TreeSnapshot;
+using zorva::agent::Node;
+using zorva::agent::NodeType;
+using zorva::agent::Property;
+using zorva::agent::TreeSnapshot;
 
 struct PropertyWord {
-  zorvagent::PropertyNumber number;
+  zorva::agent::PropertyNumber number;
   const char* word;  // as in the JSON document of a tree
 };
 
@@ -27,20 +27,20 @@ constexpr PropertyWord kProperties[] = {
     {ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES, "dns_server_addresses"},
     {ZV::NodeLexicon::PROP_PROTOCOL_IF_TYPE, "protocol_if_type"},
     {ZV::NodeLexicon::PROP_ENABLED_STATE, "enabled_state"},
-    {zorvagent::kAddresses, "addresses"},
+    {zorva::agent::kAddresses, "addresses"},
 };
 
-const char* originWord(zorvagent::AddressOrigin origin) noexcept {
+const char* originWord(zorva::agent::AddressOrigin origin) noexcept {
   switch (origin) {
-    case zorvagent::AddressOrigin::Static:
+    case zorva::agent::AddressOrigin::Static:
       return " static";
-    case zorvagent::AddressOrigin::Dhcp:
+    case zorva::agent::AddressOrigin::Dhcp:
       return " dhcp";
-    case zorvagent::AddressOrigin::Slaac:
+    case zorva::agent::AddressOrigin::Slaac:
       return " slaac";
-    case zorvagent::AddressOrigin::LinkLocal:
+    case zorva::agent::AddressOrigin::LinkLocal:
       return " link-local";
-    case zorvagent::AddressOrigin::Unknown:
+    case zorva::agent::AddressOrigin::Unknown:
       break;
   }
   return "";
@@ -49,10 +49,10 @@ const char* originWord(zorvagent::AddressOrigin origin) noexcept {
 struct ValueWords {
   std::vector<std::string> operator()(unsigned int number) const { return {std::to_string(number)}; }
   std::vector<std::string> operator()(const std::string& text) const { return {text}; }
-  std::vector<std::string> operator()(const zorvagent::SharedStrings& list) const { return *list; }
-  std::vector<std::string> operator()(const zorvagent::SharedAddresses& list) const {
+  std::vector<std::string> operator()(const zorva::agent::SharedStrings& list) const { return *list; }
+  std::vector<std::string> operator()(const zorva::agent::SharedAddresses& list) const {
     std::vector<std::string> texts;
-    for (const zorvagent::InterfaceAddress& each : *list) {
+    for (const zorva::agent::InterfaceAddress& each : *list) {
       texts.push_back(each.address + "/" + std::to_string(each.prefixLength) + originWord(each.origin));
     }
     return texts;
@@ -103,7 +103,9 @@ std::string propertyLines(const Node& node, std::size_t indent, const Layout& la
 
 }  // namespace
 
-std::vector<std::string> valueTexts(const zorvagent::PropertyValue& value) { return std::visit(ValueWords(), value); }
+std::vector<std::string> valueTexts(const zorva::agent::PropertyValue& value) {
+  return std::visit(ValueWords(), value);
+}
 
 std::string treeText(const TreeSnapshot& tree, const Layout& layout) {
   std::string out = styled(printable(tree.systemName()), Style::Heading, layout) + "\n";

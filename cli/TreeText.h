@@ -10,7 +10,7 @@ namespace zorva::cli {
 
 /// The instrumentation tree as lines: each node under its parent, a property of a node a line of its own under it. A
 /// value that was set and stands in for the host's own is marked.
-std::string treeText(const zorvagent::TreeSnapshot& tree, const Layout& layout);
+std::string treeText(const zorva::agent::TreeSnapshot& tree, const Layout& layout);
 
 /// A value that was set through the agent, for display.
 struct OverlayRow {
@@ -21,6 +21,6 @@ struct OverlayRow {
 };
 
 /// The value of a property as texts: one, or one for each element of a list.
-std::vector<std::string> valueTexts(const zorvagent::PropertyValue& value);
+std::vector<std::string> valueTexts(const zorva::agent::PropertyValue& value);
 
 }  // namespace zorva::cli

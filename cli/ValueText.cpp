@@ -5,7 +5,7 @@
 #include <limits>
 #include <vector>
 
-#include "broker/PathText.h"
+#include "broker/objects/PathText.h"
 #include "schema/Schema.h"
 
 namespace zorva::cli {

@@ -5,7 +5,7 @@
 #include <string>
 #include <string_view>
 
-#include "broker/Value.h"
+#include "broker/objects/Value.h"
 
 // Values as a person reads them.
 

@@ -27,7 +27,7 @@ ExitCode run(int argc, const char* const* argv) {
 }  // namespace
 
 int main(int argc, char** argv) {
-  zorvagent::askForExceptions();
+  zorva::agent::askForExceptions();
   try {
     return static_cast<int>(run(argc, argv));
   } catch (const Failure& failure) {

@@ -52,12 +52,12 @@ std::optional<std::string> writingProblem(const std::string& path) {
 }
 
 std::optional<std::string> missingDirectory() {
-  const std::string directory = zorvagent::dataDirectory();
+  const std::string directory = zorva::agent::dataDirectory();
   if (exists(directory)) return std::nullopt;
   return "the data directory " + directory + " does not exist";
 }
 
-std::string fileOf(const std::string& interface) { return zorvagent::dataDirectory() + "ifcfg-" + interface; }
+std::string fileOf(const std::string& interface) { return zorva::agent::dataDirectory() + "ifcfg-" + interface; }
 
 std::optional<std::string> fileAbsence(const std::string& interface) {
   if (interface.empty()) return "the interface has no name, and so no file";
@@ -70,8 +70,8 @@ std::optional<std::string> fileAbsence(const std::string& interface) {
 std::optional<std::string> lineProblem(const std::string& interface, std::string_view key) {
   constexpr std::size_t kLargestFile = std::size_t{16} << 20U;
   const std::string path = fileOf(interface);
-  const zorvagent::FileText file = zorvagent::readFile(path, kLargestFile);
-  if (file.error != 0) return path + ": " + zorvagent::fileErrorText(file.error);
+  const zorva::agent::FileText file = zorva::agent::readFile(path, kLargestFile);
+  if (file.error != 0) return path + ": " + zorva::agent::fileErrorText(file.error);
   if (file.truncated) return path + " is larger than 16 MiB";
   // A disk that is full may have cost the line.
   if (auto problem = writingProblem(path)) return problem;
@@ -83,7 +83,7 @@ std::optional<std::string> lineProblem(const std::string& interface, std::string
 
 std::string interfaceOf(const broker::Instance& instance) {
   if (schema::sameName(instance.path.className, kGeneralSettingClass)) {
-    return interfaceOfHostSettings(*zorvagent::currentTree()).value_or("");
+    return interfaceOfHostSettings(*zorva::agent::currentTree()).value_or("");
   }
   const broker::Value* id = instance.property("InstanceID");
   if (id == nullptr) id = instance.path.key("InstanceID");
@@ -108,7 +108,7 @@ std::optional<std::string> missingPlace(const broker::Instance& instance, std::s
     }
     if (!schema::sameName(instance.path.className, kEndpointClass)) return std::nullopt;
     const auto absence = missingDirectory();
-    return absence ? absence : writingProblem(zorvagent::dataDirectory());
+    return absence ? absence : writingProblem(zorva::agent::dataDirectory());
   } catch (const std::exception& problem) {  // the configuration or the tree cannot be read
     return problem.what();
   }

@@ -4,7 +4,7 @@
 #include <string>
 #include <string_view>
 
-#include "broker/Value.h"
+#include "broker/objects/Value.h"
 
 // Where this host stores what a modification changes: the file of an interface's settings, or the agent's overlay, both
 // in the agent's data directory. Safe on any thread.

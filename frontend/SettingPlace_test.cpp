@@ -18,7 +18,7 @@ namespace {
 
 using ::testing::EndsWith;
 using ::testing::HasSubstr;
-using zorvagent::testing::TemporaryDirectory;
+using zorva::agent::testing::TemporaryDirectory;
 
 constexpr const char* kTree = R"({"system_name": "host1", "nodes": [
   {"type": "System", "name": "sp", "description": "BMC", "children": [
@@ -34,7 +34,7 @@ class SettingPlaceTest : public ::testing::Test {
   SettingPlaceTest() {
     directory_.write("tree.json", kTree);
     std::filesystem::create_directory(directory_ / "data");
-    zorvagent::loadConfig(directory_.write(
+    zorva::agent::loadConfig(directory_.write(
         "agent.toml", "[agent]\ndata_dir = \"data/\"\n[tree]\nsource = \"file\"\nfile = \"tree.json\"\n"));
   }
 

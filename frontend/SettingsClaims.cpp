@@ -35,18 +35,19 @@ bool needsClaim(Access access, std::string_view className) {
 /// Empty where the change goes to no file.
 std::string interfaceOfFile(const broker::ObjectPath& changed) {
   if (schema::sameName(changed.className, kGeneralSettingClass)) {
-    return interfaceOfHostSettings(*zorvagent::currentTree()).value_or("");
+    return interfaceOfHostSettings(*zorva::agent::currentTree()).value_or("");
   }
   if (!schema::sameName(changed.className, kSettingClass)) return {};
   const broker::Value* id = changed.key("InstanceID");
   return id == nullptr ? std::string() : interfaceOfId(id->asText());
 }
 
-using LockPointer = std::shared_ptr<zorvagent::SettingsLock>;
+using LockPointer = std::shared_ptr<zorva::agent::SettingsLock>;
 
 LockPointer takeLock(Access access) {
-  return std::make_shared<zorvagent::SettingsLock>(
-      zorvagent::dataDirectory(), access == Access::Change ? zorvagent::Access::Change : zorvagent::Access::Read);
+  return std::make_shared<zorva::agent::SettingsLock>(zorva::agent::dataDirectory(), access == Access::Change
+                                                                                         ? zorva::agent::Access::Change
+                                                                                         : zorva::agent::Access::Read);
 }
 
 class LockClaim : public broker::Claim {
@@ -98,9 +99,9 @@ std::string interfaceOfId(std::string_view instanceId) {
   return percent == std::string_view::npos ? std::string() : std::string(instanceId.substr(percent + 1));
 }
 
-std::optional<std::string> interfaceOfHostSettings(const zorvagent::TreeSnapshot& tree) {
-  for (const zorvagent::Node& node : tree.nodes()) {
-    if (node.type() != zorvagent::NodeType::NetworkIPConfig) continue;
+std::optional<std::string> interfaceOfHostSettings(const zorva::agent::TreeSnapshot& tree) {
+  for (const zorva::agent::Node& node : tree.nodes()) {
+    if (node.type() != zorva::agent::NodeType::NetworkIPConfig) continue;
     if (tree.parent(tree.parent(node)).description() == "BMC") continue;
     const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
     return name == nullptr ? std::string() : *name;

@@ -29,7 +29,7 @@ class SettingsClaims {
   broker::ClaimHook hook() const;
 
   /// The lock for a program that reads, decides and then changes; its requests do without one of their own meanwhile.
-  /// For a program of one thread. One within another does nothing. Throws as zorvagent::SettingsLock does.
+  /// For a program of one thread. One within another does nothing. Throws as zorva::agent::SettingsLock does.
   class Hold {
    public:
     explicit Hold(const SettingsClaims& claims);
@@ -50,6 +50,6 @@ std::string interfaceOfId(std::string_view instanceId);
 
 /// The interface whose file holds the settings of the host as a whole: that of the first configuration outside a
 /// service processor. Nothing where there is none; the empty text where that one has no name.
-std::optional<std::string> interfaceOfHostSettings(const zorvagent::TreeSnapshot& tree);
+std::optional<std::string> interfaceOfHostSettings(const zorva::agent::TreeSnapshot& tree);
 
 }  // namespace zorva::frontend

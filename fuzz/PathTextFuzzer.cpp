@@ -3,7 +3,7 @@
 #include <cstdio>
 #include <cstdlib>
 
-#include "broker/PathText.h"
+#include "broker/objects/PathText.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   using zorva::broker::ObjectPath;

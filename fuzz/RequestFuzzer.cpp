@@ -4,11 +4,11 @@
 #include <cstdio>
 #include <cstdlib>
 
+#include "cimom/Interop.h"
+#include "cimom/Service.h"
 #include "cimxml/RequestReader.h"
 #include "cimxml/XmlCheck.h"
 #include "schema/Schema.h"
-#include "server/Interop.h"
-#include "server/Service.h"
 
 namespace {
 
@@ -19,9 +19,9 @@ using namespace zorva;  // NOLINT(google-build-using-namespace)
   std::abort();
 }
 
-class Sink : public server::ResponseSink {
+class Sink : public http::ResponseSink {
  public:
-  void begin(int code, const server::HeaderList&) override { status = code; }
+  void begin(int code, const http::HeaderList&) override { status = code; }
   void write(std::string_view piece) override { body += piece; }
   void fail(std::uint32_t, std::string_view) override { failed = true; }
   bool begun() const override { return status != 0; }
@@ -34,13 +34,13 @@ class Sink : public server::ResponseSink {
 broker::BrokerOptions options() {
   broker::BrokerOptions made;
   made.providerDirectory = "/nonexistent";
-  server::serveInterop(made);
+  cimom::serveInterop(made);
   return made;
 }
 
 /// The header fields that a client would send with such a body.
-server::HttpRequest requestOf(std::string body, const cimxml::CimRequest& read) {
-  server::HttpRequest request{"POST", "/cimom", {{"CIMOperation", "MethodCall"}}, std::move(body), false};
+http::HttpRequest requestOf(std::string body, const cimxml::CimRequest& read) {
+  http::HttpRequest request{"POST", "/cimom", {{"CIMOperation", "MethodCall"}}, std::move(body), false};
   if (read.isMultiple || read.calls.empty() || read.calls.front().isExtrinsic) return request;
   request.headers.emplace_back("CIMMethod", read.calls.front().name);
   request.headers.emplace_back("CIMObject", read.calls.front().target.nameSpace);
@@ -51,7 +51,7 @@ server::HttpRequest requestOf(std::string body, const cimxml::CimRequest& read) 
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   static broker::Broker broker(schema::loadBuiltInClasses(schema::ClassSet::Interop), options());
-  static server::Service service(broker);
+  static cimom::Service service(broker);
   std::string body(reinterpret_cast<const char*>(data), size);
   cimxml::CimRequest read;
   if (const auto error = cimxml::readRequest(body, {}, read)) {

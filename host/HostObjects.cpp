@@ -10,12 +10,12 @@
 
 namespace zorva::host {
 
-using zorvagent::AddressFamily;
-using zorvagent::AddressOrigin;
-using zorvagent::InterfaceAddress;
-using zorvagent::Node;
-using zorvagent::NodeType;
-using zorvagent::TreeSnapshot;
+using zorva::agent::AddressFamily;
+using zorva::agent::AddressOrigin;
+using zorva::agent::InterfaceAddress;
+using zorva::agent::Node;
+using zorva::agent::NodeType;
+using zorva::agent::TreeSnapshot;
 
 namespace {
 

@@ -22,7 +22,7 @@ using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 using ::testing::Not;
 using ::testing::SizeIs;
-using zorvagent::AddressOrigin;
+using zorva::agent::AddressOrigin;
 
 // A host with two interfaces, the first with three addresses, and a service processor with one.
 class HostProviders : public ::testing::Test {

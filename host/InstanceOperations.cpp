@@ -145,7 +145,7 @@ bool hasKeysOf(const HostObject& object, const CMPIObjectPath* ref) {
 // The objects of one class, each handed to the function until that gives a failure or says to stop.
 template <typename Handle>
 CMPIStatus forEachObject(const CMPIBroker* broker, Publish publish, const std::string& className, Handle handle) try {
-  for (const HostObject& object : publish(*zorvagent::currentTree())) {
+  for (const HostObject& object : publish(*zorva::agent::currentTree())) {
     if (strcasecmp(object.className, className.c_str()) != 0) continue;
     const CMPIStatus status = handle(object);
     if (status.rc != CMPI_RC_OK) return status;

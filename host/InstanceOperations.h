@@ -12,7 +12,7 @@
 namespace zorva::host {
 
 // What a provider publishes of the host as it is.
-using Publish = std::vector<HostObject> (*)(const zorvagent::TreeSnapshot& tree);
+using Publish = std::vector<HostObject> (*)(const zorva::agent::TreeSnapshot& tree);
 
 // Each reads the host afresh and hands out the objects of the class that ref names. rc CMPI_RC_ERR_FAILED, with the
 // reason, where the host cannot be read; no exception leaves them. Thread-safe.

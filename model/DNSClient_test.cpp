@@ -338,7 +338,7 @@ TEST(DNSClientWalk, MakingItsFirstCursorStandsUnguarded) {
   const FailingTree failing(1);
   std::map<std::string, DNSClient> found;
   EXPECT_THROW(getDNSClientInstances(found), std::runtime_error);
-  EXPECT_THAT(failing.calls(), ElementsAre(zorvagent::TreeCall::Construct));
+  EXPECT_THAT(failing.calls(), ElementsAre(zorva::agent::TreeCall::Construct));
 }
 
 TEST(DNSClientWalk, EveryLaterFailureOfTheTreeIsCaughtAndKeepsWhatWasReached) {

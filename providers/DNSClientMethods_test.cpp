@@ -293,7 +293,7 @@ TEST_F(EndpointMethods, ServerSearchOrderReadsTheServersAgain) {
 TEST_F(EndpointMethods, ServerSearchOrderFailsWhereTheServersCannotBeReadAgain) {
   haveOne();
   // The tree fails in the last walk of all, that of the method itself.
-  std::vector<zorvagent::TreeCall> calls;
+  std::vector<zorva::agent::TreeCall> calls;
   const auto invoke = [this] {
     return provider.invokeMethod(kClass.key("Name", "eth0"), "SetDNSServerSearchOrder",
                                  {{"DNSServerSearchOrder", texts({"192.0.2.53"})}});

@@ -467,7 +467,7 @@ TEST_F(GeneralElementSettingData, SurvivesEveryFailureOfTheBroker) {
 
 TEST_F(GeneralElementSettingData, SurvivesEveryFailureOfTheTree) {
   install({"host1"});
-  using zorvagent::TreeCall;
+  using zorva::agent::TreeCall;
   expectToSurviveEveryTreeFailure(
       allRequests(pair("host1"), generalSettingPath(), systemPath("host1")),
       {TreeCall::Construct, TreeCall::Copy, TreeCall::Test, TreeCall::SelectByPath, TreeCall::GetPathToParent,

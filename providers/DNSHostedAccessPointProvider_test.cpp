@@ -500,7 +500,7 @@ TEST_F(HostedAccessPoint, SurvivesEveryFailureOfTheBroker) {
 TEST_F(HostedAccessPoint, SurvivesEveryFailureOfTheTree) {
   install({"eth0", "eth1"}, {"host1"});
   expectToSurviveEveryTreeFailure(allRequests(pair("host1", "eth1"), endpointPath("eth1"), systemPath("host1")),
-                                  {zorvagent::TreeCall::Construct});
+                                  {zorva::agent::TreeCall::Construct});
 }
 
 }  // namespace

@@ -530,7 +530,7 @@ TEST_F(RemoteAccessAvailableToElement, SurvivesEveryFailureOfTheBroker) {
 TEST_F(RemoteAccessAvailableToElement, SurvivesEveryFailureOfTheTree) {
   installTwoOfEach();
   expectToSurviveEveryTreeFailure(allRequests(pair("192.0.2.2", "eth1"), endpointPath("eth0"), serverPath("192.0.2.1")),
-                                  {zorvagent::TreeCall::Construct});
+                                  {zorva::agent::TreeCall::Construct});
 }
 
 }  // namespace

@@ -500,7 +500,7 @@ TEST_F(SAPSAPDependency, SurvivesEveryFailureOfTheBroker) {
 TEST_F(SAPSAPDependency, SurvivesEveryFailureOfTheTree) {
   install({"eth0", "eth1"}, {"eth0", "eth1"});
   expectToSurviveEveryTreeFailure(allRequests(pair("eth1", "eth1"), endpointPath("eth1"), ipEndpointPath("eth1")),
-                                  {zorvagent::TreeCall::Construct});
+                                  {zorva::agent::TreeCall::Construct});
 }
 
 }  // namespace

@@ -3,7 +3,7 @@
 #include <CLI/CLI.hpp>
 #include <filesystem>
 
-#include "server/Listener.h"
+#include "http/Listener.h"
 
 namespace zorva::server {
 
@@ -70,7 +70,7 @@ Config configOf(const CommandLine& line) {
   if (line.logLevel.has_value()) config.logLevel = *line.logLevel;
   if (!line.agentConfig.empty()) config.agentConfig = absolute(line.agentConfig);
   if (!line.providerDirectory.empty()) config.providerDirectory = absolute(line.providerDirectory);
-  if (config.addresses.has_value()) checkAddresses(*config.addresses);
+  if (config.addresses.has_value()) http::checkAddresses(*config.addresses);
   return config;
 }
 

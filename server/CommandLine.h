@@ -12,7 +12,7 @@ namespace zorva::server {
 
 struct CommandLine {
   std::string configFile;  ///< empty: the usual place
-  std::optional<Addresses> addresses;
+  std::optional<http::Addresses> addresses;
   std::optional<int> port;
   std::optional<int> logLevel;
   std::string agentConfig;
@@ -30,7 +30,7 @@ struct Telling {
 std::variant<CommandLine, Telling> readCommandLine(int argc, const char* const* argv);
 
 /// The configuration that the command line asks for: its file with the command line's own values in it. Throws
-/// zorvagent::ConfigError, std::invalid_argument for an address that this server does not listen on.
+/// zorva::agent::ConfigError, std::invalid_argument for an address that this server does not listen on.
 Config configOf(const CommandLine& commandLine);
 
 }  // namespace zorva::server

@@ -19,7 +19,7 @@
 
 namespace zorva::server {
 
-using zorvagent::ConfigError;
+using zorva::agent::ConfigError;
 
 namespace {
 
@@ -73,7 +73,7 @@ class TableReader {
     value = std::chrono::seconds(seconds);
   }
 
-  void take(const char* key, std::optional<Addresses>& value) {
+  void take(const char* key, std::optional<http::Addresses>& value) {
     const toml::node* node = find(key);
     if (node == nullptr) return;
     const toml::array* array = node->as_array();
@@ -130,7 +130,7 @@ void readListen(Config& config, const toml::table& document) {
 void readLimits(Config& config, const toml::table& document) {
   constexpr std::size_t kKibibyte = 1024;
   constexpr std::size_t kMebibyte = 1024 * 1024;
-  HttpLimits& limits = config.limits;
+  http::HttpLimits& limits = config.limits;
   TableReader table(config.file, document, "limits");
   table.take("body_kib", limits.bodyBytes, 1, 1024 * 1024, kKibibyte);
   table.take("bodies_mib", limits.bodiesBytes, 1, 16 * 1024, kMebibyte);

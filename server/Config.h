@@ -6,25 +6,23 @@
 #include <vector>
 
 #include "agent/config/Config.h"
-#include "server/HttpLimits.h"
+#include "http/HttpLimits.h"
+#include "http/Listener.h"
 
 // The configuration of zorvacimd: a TOML 1.0 file, and what the command line puts in its place.
 
 namespace zorva::server {
-
-/// One listening address as text: "127.0.0.1", "::1".
-using Addresses = std::vector<std::string>;
 
 struct Config {
   std::string file;  ///< what it was read from; empty for the built-in defaults
 
   // [listen]
   /// Absent: 127.0.0.1 and ::1, of which the host may lack one.
-  std::optional<Addresses> addresses;
+  std::optional<http::Addresses> addresses;
   int port = 5988;  ///< 0: one that is free
 
   // [limits]
-  HttpLimits limits;
+  http::HttpLimits limits;
   int nesting = 128;  ///< the most elements, one within another, in a request
 
   // [http]
@@ -47,7 +45,8 @@ struct Config {
 };
 
 /// Reads and checks a configuration. Paths that are not absolute are taken from the directory of the file. Throws
-/// zorvagent::ConfigError, which names file, line and key, for whatever is wrong, a file that cannot be read included.
+/// zorva::agent::ConfigError, which names file, line and key, for whatever is wrong, a file that cannot be read
+/// included.
 Config readConfig(const std::string& path);
 
 /// The configuration where none is named: /etc/zorvagent/zorvacimd.toml, or the built-in defaults where that is not

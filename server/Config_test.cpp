@@ -22,20 +22,20 @@ class ServerConfig : public ::testing::Test {
   std::string wrong(const std::string& text) {
     try {
       read(text);
-    } catch (const zorvagent::ConfigError& error) {
+    } catch (const zorva::agent::ConfigError& error) {
       return std::string(error.what()).substr(directory_.path().size());
     }
     return "nothing";
   }
 
-  zorvagent::testing::TemporaryDirectory directory_;
+  zorva::agent::testing::TemporaryDirectory directory_;
 };
 
 TEST_F(ServerConfig, AnEmptyFileIsTheDefaults) {
   const Config config = read("");
   EXPECT_EQ(config.port, 5988);
   EXPECT_FALSE(config.addresses.has_value());
-  EXPECT_EQ(config.limits.bodyBytes, HttpLimits().bodyBytes);
+  EXPECT_EQ(config.limits.bodyBytes, http::HttpLimits().bodyBytes);
 }
 
 TEST_F(ServerConfig, EveryKeyIsRead) {
@@ -156,8 +156,8 @@ TEST_F(ServerConfig, AnErrorNamesFileLineAndKey) {
 }
 
 TEST_F(ServerConfig, WhatIsNoFileIsAnErrorAndNoWait) {
-  EXPECT_THROW(readConfig(directory_.path()), zorvagent::ConfigError);
-  EXPECT_THROW(readConfig(directory_ / "absent.toml"), zorvagent::ConfigError);
+  EXPECT_THROW(readConfig(directory_.path()), zorva::agent::ConfigError);
+  EXPECT_THROW(readConfig(directory_ / "absent.toml"), zorva::agent::ConfigError);
 }
 
 TEST_F(ServerConfig, TheCommandLineHoldsOverTheFile) {

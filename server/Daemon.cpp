@@ -21,13 +21,14 @@
 #include <vector>
 
 #include "agent/Agent.h"
+#include "cimom/Interop.h"
+#include "cimom/Service.h"
 #include "frontend/SettingsClaims.h"
+#include "http/HttpServer.h"
+#include "http/Listener.h"
+#include "http/Log.h"
 #include "schema/Schema.h"
-#include "server/HttpServer.h"
-#include "server/Interop.h"
-#include "server/Listener.h"
-#include "server/Log.h"
-#include "server/Service.h"
+#include "server/BrokerLog.h"
 #include "server/Systemd.h"
 
 namespace zorva::server {
@@ -46,7 +47,7 @@ constexpr std::chrono::milliseconds kNoDescriptors{100};
 void tellError(const std::string& text) { std::fprintf(stderr, "zorvacimd: %s\n", text.c_str()); }
 
 /// Each connection is a descriptor. What the limits on descriptors leave no room for cannot be had.
-void makeRoomForConnections(HttpLimits& limits) {
+void makeRoomForConnections(http::HttpLimits& limits) {
   constexpr rlim_t kOthers = 64;
   rlimit files{};
   if (::getrlimit(RLIMIT_NOFILE, &files) != 0) return;
@@ -69,12 +70,13 @@ sigset_t handledSignals() {
 }
 
 void applyLog(const Config& config) {
-  zorvagent::setLogTarget(zorvagent::LogStream::Log, config.logTarget.value_or(zorvagent::currentConfig().logTarget));
-  setLogLevel(config.logLevel);
+  zorva::agent::setLogTarget(zorva::agent::LogStream::Log,
+                             config.logTarget.value_or(zorva::agent::currentConfig().logTarget));
+  http::setLogLevel(config.logLevel);
 }
 
-ServiceOptions serviceOptions(const Config& config) {
-  ServiceOptions options;
+cimom::ServiceOptions serviceOptions(const Config& config) {
+  cimom::ServiceOptions options;
   options.log = logServiceLine;
   options.changes = logChange;
   options.maxDepth = static_cast<std::size_t>(config.nesting);
@@ -89,7 +91,7 @@ ServiceOptions serviceOptions(const Config& config) {
 /// What a process that was killed left of a change is put back by who takes the lock next.
 void mendSettings() noexcept {
   try {
-    const zorvagent::SettingsLock lock(zorvagent::dataDirectory(), zorvagent::Access::Read);
+    const zorva::agent::SettingsLock lock(zorva::agent::dataDirectory(), zorva::agent::Access::Read);
   } catch (const std::exception& error) {
     ZORVA_LOG(Error, error.what());
   }
@@ -120,7 +122,7 @@ class Daemon {
   using Clock = std::chrono::steady_clock;
 
   void greet() const;
-  void acceptFrom(const Listener& listener);
+  void acceptFrom(const http::Listener& listener);
   bool handleSignal();
   void reload();
   void lookAfter();
@@ -128,11 +130,11 @@ class Daemon {
 
   const CommandLine commandLine_;
   Config config_;
-  Descriptor signals_;
-  std::vector<Listener> listeners_;
+  http::Descriptor signals_;
+  std::vector<http::Listener> listeners_;
   std::unique_ptr<broker::Broker> broker_;
-  std::unique_ptr<Service> service_;
-  std::unique_ptr<HttpServer> server_;
+  std::unique_ptr<cimom::Service> service_;
+  std::unique_ptr<http::HttpServer> server_;
   Clock::time_point acceptAgain_{};
   std::size_t requestsSeen_ = 0;     ///< when it was last looked
   std::size_t requestsTrimmed_ = 0;  ///< when memory was last given back
@@ -145,16 +147,18 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
   const sigset_t signals = handledSignals();
   ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);  // for all threads to come
   ::signal(SIGPIPE, SIG_IGN);
-  signals_ = Descriptor(::signalfd(-1, &signals, SFD_NONBLOCK | SFD_CLOEXEC));
+  signals_ = http::Descriptor(::signalfd(-1, &signals, SFD_NONBLOCK | SFD_CLOEXEC));
   if (!signals_) throw std::runtime_error(std::string("cannot wait for signals: ") + std::strerror(errno));
 
   const int inherited = countOfInheritedSockets();
-  listeners_ = inherited > 0 ? adoptListeners(inherited) : listenOn(config_.addresses, config_.port);
+  listeners_ = inherited > 0 ? http::adoptListeners(inherited) : http::listenOn(config_.addresses, config_.port);
   broker_ = makeBroker(config_);
-  service_ = std::make_unique<Service>(*broker_, serviceOptions(config_));
-  server_ = std::make_unique<HttpServer>(
+  service_ = std::make_unique<cimom::Service>(*broker_, serviceOptions(config_));
+  server_ = std::make_unique<http::HttpServer>(
       config_.limits, config_.threads,
-      [service = service_.get()](const HttpRequest& request, ResponseSink& sink) { service->handle(request, sink); },
+      [service = service_.get()](const http::HttpRequest& request, http::ResponseSink& sink) {
+        service->handle(request, sink);
+      },
       pageText(shortUrl(listeners_.front().url)));
 }
 
@@ -162,7 +166,7 @@ void Daemon::greet() const {
   const bool isTerminal = ::isatty(STDOUT_FILENO) == 1;
   if (!commandLine_.greet && !isTerminal && config_.port != 0) return;
   std::string text = "zorvacimd listens on ";
-  for (const Listener& each : listeners_) text += (&each == listeners_.data() ? "" : " and ") + each.url;
+  for (const http::Listener& each : listeners_) text += (&each == listeners_.data() ? "" : " and ") + each.url;
   text += '\n';
   if (commandLine_.greet || isTerminal) {
     const std::string url = shortUrl(listeners_.front().url);
@@ -175,7 +179,7 @@ void Daemon::greet() const {
 
 bool Daemon::run() {
   std::vector<pollfd> waits{{signals_.get(), POLLIN, 0}};
-  for (const Listener& each : listeners_) waits.push_back({each.socket.get(), POLLIN, 0});
+  for (const http::Listener& each : listeners_) waits.push_back({each.socket.get(), POLLIN, 0});
   notifyServiceManager("READY=1");
   greet();
   for (;;) {
@@ -192,7 +196,7 @@ bool Daemon::run() {
   return server_->stop();
 }
 
-void Daemon::acceptFrom(const Listener& listener) {
+void Daemon::acceptFrom(const http::Listener& listener) {
   constexpr int kAtOnce = 64;
   for (int i = 0; i < kAtOnce; ++i) {
     sockaddr_storage peer{};
@@ -224,7 +228,7 @@ void Daemon::reload() try {
   const auto now = std::chrono::duration_cast<std::chrono::microseconds>(Clock::now().time_since_epoch());
   notifyServiceManager("RELOADING=1\nMONOTONIC_USEC=" + std::to_string(now.count()));
   Config fresh = configOf(commandLine_);
-  zorvagent::loadConfig(fresh.agentConfig);
+  zorva::agent::loadConfig(fresh.agentConfig);
   applyLog(fresh);
   makeRoomForConnections(fresh.limits);
   server_->setLimits(fresh.limits);
@@ -264,12 +268,12 @@ int Daemon::timeout() const {
 
 /// Opens the log where it goes to. A file that was not there does not stay: another user may be the one who serves.
 void tryLog(const Config& config) {
-  const std::string target = config.logTarget.value_or(zorvagent::currentConfig().logTarget);
+  const std::string target = config.logTarget.value_or(zorva::agent::currentConfig().logTarget);
   const bool isFile = target.find('/') != std::string::npos;
   const bool isNew = isFile && ::access(target.c_str(), F_OK) != 0;
   applyLog(config);
   if (!isNew) return;
-  zorvagent::setLogTarget(zorvagent::LogStream::Log, "off");
+  zorva::agent::setLogTarget(zorva::agent::LogStream::Log, "off");
   ::unlink(target.c_str());
 }
 
@@ -286,7 +290,7 @@ void tryProviders(const Config& config, const MakeBroker& makeBroker, std::vecto
 
 /// Reads and opens what a start would, and says all that is wrong.
 int check(const Config& config, const MakeBroker& makeBroker) {
-  zorvagent::loadConfig(config.agentConfig);
+  zorva::agent::loadConfig(config.agentConfig);
   std::vector<std::string> problems;
   try {
     tryLog(config);
@@ -305,7 +309,7 @@ int serve(const CommandLine& commandLine, const MakeBroker& makeBroker) {
   if (commandLine.checkConfig) return check(config, makeBroker);
   // A few heaps for all threads: more would hold memory for each of them.
   ::mallopt(M_ARENA_MAX, 2);
-  zorvagent::loadConfig(config.agentConfig);
+  zorva::agent::loadConfig(config.agentConfig);
   applyLog(config);
   mendSettings();
   auto daemon = std::make_unique<Daemon>(commandLine, std::move(config), makeBroker);
@@ -323,7 +327,7 @@ std::unique_ptr<broker::Broker> makeBuiltInBroker(const Config& config) {
       config.providerDirectory.empty() ? broker::ProviderRegistry::builtInDirectory() : config.providerDirectory;
   options.log = logBrokerLine;
   options.claim = frontend::SettingsClaims().hook();
-  serveInterop(options);
+  cimom::serveInterop(options);
   return std::make_unique<broker::Broker>(schema::loadBuiltInClasses(schema::ClassSet::Interop), std::move(options));
 }
 
@@ -339,7 +343,7 @@ int runServer(int argc, const char* const* argv, const MakeBroker& makeBroker) {
   }
   try {
     return serve(std::get<CommandLine>(read), makeBroker);
-  } catch (const zorvagent::ConfigError& error) {
+  } catch (const zorva::agent::ConfigError& error) {
     tellError(error.what());
     return kWrongUsage;
   } catch (const std::invalid_argument& error) {

@@ -15,21 +15,21 @@
 #include <fstream>
 #include <thread>
 
+#include "http/testing/TestWire.h"
 #include "server/testing/TestDaemon.h"
-#include "server/testing/TestWire.h"
 
 namespace zorva::server {
 namespace {
 
+using http::testing::Wire;
+using http::testing::WireResponse;
 using std::chrono::milliseconds;
 using std::chrono::seconds;
 using ::testing::HasSubstr;
 using ::testing::StartsWith;
 using testing::TestDaemon;
-using testing::Wire;
-using testing::WireResponse;
 
-const std::string kEndpoints = testing::enumeration("EnumerateInstanceNames", "ZORVA_DNSProtocolEndPoint");
+const std::string kEndpoints = http::testing::enumeration("EnumerateInstanceNames", "ZORVA_DNSProtocolEndPoint");
 
 /// Asks for the endpoints; the names of the interfaces are in the answer.
 std::string endpoints(int port) {
@@ -58,8 +58,8 @@ TEST(Daemon, SaysToABrowserWhatItIsAndHowToAskIt) {
 
 TEST(Daemon, AnswersMPostWithAnEmptyExt) {
   const TestDaemon daemon;
-  std::string request = testing::enumeration("EnumerateInstanceNames", "ZORVA_DNSProtocolEndPoint",
-                                             "Man: http://www.dmtf.org/cim/mapping/http/v1.0 ; ns=73\r\n");
+  std::string request = http::testing::enumeration("EnumerateInstanceNames", "ZORVA_DNSProtocolEndPoint",
+                                                   "Man: http://www.dmtf.org/cim/mapping/http/v1.0 ; ns=73\r\n");
   Wire wire(daemon.port());
   wire.send("M-" + request);
   const WireResponse response = wire.receive();
@@ -72,10 +72,10 @@ TEST(Daemon, AnswersMPostWithAnEmptyExt) {
 std::string firstName(int port, const std::string& method, const std::string& object, const std::string& call) {
   Wire wire(port);
   wire.send(
-      testing::posting("<?xml version=\"1.0\" encoding=\"utf-8\"?><CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.0\">"
-                       "<MESSAGE ID=\"1\" PROTOCOLVERSION=\"1.0\"><SIMPLEREQ>" +
-                           call + "</SIMPLEREQ></MESSAGE></CIM>",
-                       "CIMOperation: MethodCall\r\nCIMMethod: " + method + "\r\nCIMObject: " + object + "\r\n"));
+      http::testing::posting("<?xml version=\"1.0\" encoding=\"utf-8\"?><CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.0\">"
+                             "<MESSAGE ID=\"1\" PROTOCOLVERSION=\"1.0\"><SIMPLEREQ>" +
+                                 call + "</SIMPLEREQ></MESSAGE></CIM>",
+                             "CIMOperation: MethodCall\r\nCIMMethod: " + method + "\r\nCIMObject: " + object + "\r\n"));
   const std::string body = wire.receive().body;
   EXPECT_EQ(body.find("<INSTANCENAME"), body.rfind("<INSTANCENAME")) << "the host has one endpoint: " << body;
   const std::size_t begin = body.find("<INSTANCENAME");
@@ -107,7 +107,7 @@ TEST(Daemon, TheCentralInstancesAreThoseThatConformToTheProfile) {
 TEST(Daemon, LogsAChangeAtTheDefaultLevel) {
   const TestDaemon daemon("", {"--listen", "127.0.0.1", "--port", "0", "--log-level", "5000"});
   Wire wire(daemon.port());
-  wire.send(testing::posting(
+  wire.send(http::testing::posting(
       "<?xml version=\"1.0\" encoding=\"utf-8\"?><CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.0\">"
       "<MESSAGE ID=\"1\" PROTOCOLVERSION=\"1.0\"><SIMPLEREQ><IMETHODCALL NAME=\"SetProperty\"><LOCALNAMESPACEPATH>"
       "<NAMESPACE NAME=\"root\"/><NAMESPACE NAME=\"cimv2\"/></LOCALNAMESPACEPATH><IPARAMVALUE NAME=\"InstanceName\">"
@@ -213,7 +213,7 @@ TEST(HostileRequests, ATruncatedRequestIsNoneAndIsLogged) {
 TEST(HostileRequests, ARefusedCimHeaderIsNamedInCIMError) {
   const TestDaemon daemon;
   Wire wire(daemon.port());
-  wire.send(testing::posting("<CIM/>", "CIMObject: a\r\nCIMObject: b\r\n"));
+  wire.send(http::testing::posting("<CIM/>", "CIMObject: a\r\nCIMObject: b\r\n"));
   const WireResponse response = wire.receive();
   EXPECT_EQ(response.status, 400);
   EXPECT_EQ(response.headers.at("cimerror"), "header-mismatch");
@@ -239,8 +239,8 @@ std::vector<std::string> largeRequests() {
   const auto request = [&](const std::string& before, const char* begin, const char* end, const std::string& after) {
     std::string body = head + before;
     for (int i = 1'000'000; i < 1'140'000 && body.size() < 3'900'000; ++i) body += begin + std::to_string(i) + end;
-    return testing::posting(body + after + tail,
-                            "CIMOperation: MethodCall\r\nCIMMethod: GetClass\r\nCIMObject: interop\r\n");
+    return http::testing::posting(body + after + tail,
+                                  "CIMOperation: MethodCall\r\nCIMMethod: GetClass\r\nCIMObject: interop\r\n");
   };
   const std::string parameter = "<IPARAMVALUE NAME=\"P\">";
   return {
@@ -293,7 +293,7 @@ TEST(DaemonProcess, RefusesOtherThanLoopbackAddresses) {
 }
 
 TEST(DaemonProcess, ChecksAConfiguration) {
-  const zorvagent::testing::TemporaryDirectory directory;
+  const zorva::agent::testing::TemporaryDirectory directory;
   const std::string good = directory.write("good.toml", "[listen]\nport = 1\n");
   const std::string bad = directory.write("bad.toml", "\n[limits]\nbody = 1\n");
   const auto fine = TestDaemon::run({"--config", good, "--check-config"});
@@ -305,7 +305,7 @@ TEST(DaemonProcess, ChecksAConfiguration) {
 }
 
 TEST(DaemonProcess, CheckingAConfigurationOpensTheLogAndTheProviders) {
-  const zorvagent::testing::TemporaryDirectory directory;
+  const zorva::agent::testing::TemporaryDirectory directory;
   const std::string bad =
       directory.write("bad.toml", "[agent]\nprovider_dir = \"none\"\n[log]\ntarget = \"no/such/directory/log\"\n");
   const auto wrong = TestDaemon::run({"--config", bad, "--check-config"});
@@ -323,7 +323,7 @@ TEST(DaemonProcess, CheckingAConfigurationOpensTheLogAndTheProviders) {
 }
 
 TEST(DaemonProcess, CheckingAConfigurationLeavesNoLogBehind) {
-  const zorvagent::testing::TemporaryDirectory directory;
+  const zorva::agent::testing::TemporaryDirectory directory;
   const std::string good = directory.write("good.toml", "[log]\ntarget = \"log\"\n");
   EXPECT_EQ(TestDaemon::run({"--config", good, "--check-config"}).exitCode, 0);
   EXPECT_NE(::access((directory / "log").c_str(), F_OK), 0);
@@ -353,7 +353,7 @@ TEST(DaemonProcess, EndsAtASignal) {
 
 TEST(DaemonProcess, ReadsItsConfigurationAgain) {
   TestDaemon daemon("[limits]\nbody_kib = 4\n");
-  const std::string request = testing::posting(std::string(5000, 'x'), "CIMOperation: MethodCall\r\n");
+  const std::string request = http::testing::posting(std::string(5000, 'x'), "CIMOperation: MethodCall\r\n");
   Wire before(daemon.port());
   before.send(request);
   EXPECT_EQ(before.receive().status, 413);
@@ -399,9 +399,9 @@ class NotifySocket {
   }
 
  private:
-  zorvagent::testing::TemporaryDirectory directory_;
+  zorva::agent::testing::TemporaryDirectory directory_;
   std::string path_;
-  Descriptor socket_;
+  http::Descriptor socket_;
 };
 
 TEST(DaemonProcess, TellsTheServiceManagerHowItFares) {

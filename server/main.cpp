@@ -2,6 +2,6 @@
 #include "server/Daemon.h"
 
 int main(int argc, char** argv) {
-  zorvagent::askForExceptions();
+  zorva::agent::askForExceptions();
   return zorva::server::runServer(argc, argv, zorva::server::makeBuiltInBroker);
 }

@@ -94,16 +94,16 @@ TEST_F(LineFeedKeepingReader, IsOpenedForReadingAndClosedBeforeItEnds) {
 }
 
 // Writes the lines of the log among the calls of the reader.
-class LogAmongCalls : private zorvagent::LogSink {
+class LogAmongCalls : private zorva::agent::LogSink {
  public:
-  LogAmongCalls() { zorvagent::setLogSink(this); }
-  ~LogAmongCalls() override { zorvagent::setLogSink(nullptr); }
+  LogAmongCalls() { zorva::agent::setLogSink(this); }
+  ~LogAmongCalls() override { zorva::agent::setLogSink(nullptr); }
   LogAmongCalls(const LogAmongCalls&) = delete;
   LogAmongCalls& operator=(const LogAmongCalls&) = delete;
 
  private:
-  void record(const zorvagent::LogCall& call) override {
-    if (call.stream == zorvagent::LogStream::Log) calls.push_back(call.message.substr(0, call.message.find(" at ")));
+  void record(const zorva::agent::LogCall& call) override {
+    if (call.stream == zorva::agent::LogStream::Log) calls.push_back(call.message.substr(0, call.message.find(" at ")));
   }
 };
 

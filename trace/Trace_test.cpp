@@ -116,8 +116,8 @@ TEST(LogPair, GoesToTheLogAndThenToTheTraceWithTheSameArguments) {
   logError(kLogger, kSite, "No ObjectPath Found");
   const LogLines lines = logger.lines();
   ASSERT_EQ(2U, lines.size());
-  EXPECT_EQ(zorvagent::LogStream::Log, lines[0].stream);
-  EXPECT_EQ(zorvagent::LogStream::Trace, lines[1].stream);
+  EXPECT_EQ(zorva::agent::LogStream::Log, lines[0].stream);
+  EXPECT_EQ(zorva::agent::LogStream::Trace, lines[1].stream);
   for (const LogLine& line : lines) {
     EXPECT_EQ("Zorvagent.Sample walk model/Sample.cpp:42 6000", siteOf(line));
     EXPECT_EQ("MESSAGE [File: model/Sample.cpp, Line: 42]: No ObjectPath Found", line.text);

@@ -19,7 +19,7 @@
 #define TOML_ENABLE_FORMATTERS 0
 #include <toml++/toml.h>
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 constexpr const char* kDefaultFile = "/etc/zorvagent/agent.toml";
@@ -189,4 +189,4 @@ Config readDefaultConfig() {
   return absent ? Config() : readConfig(kDefaultFile);
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

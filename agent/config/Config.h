@@ -6,7 +6,7 @@
 
 #include "agent/interface/AgentApi.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // A file that was written by a person and is wrong: the configuration, or the JSON document of a tree. what() is one
 // line, "FILE:LINE: KEY: what is wrong", without the parts that are not known.
@@ -60,4 +60,4 @@ ZORVA_AGENT_API Config readConfig(const std::string& path);
 // /etc/zorvagent/agent.toml, else, where that is not there, the built-in defaults. Throws as readConfig does.
 ZORVA_AGENT_API Config readDefaultConfig();
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

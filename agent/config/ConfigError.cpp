@@ -1,7 +1,7 @@
 #include "agent/config/Config.h"
 #include "agent/log/Escape.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 std::string oneLine(const std::string& file, int line, const std::string& key, const std::string& problem) {
@@ -24,4 +24,4 @@ ConfigError::ConfigError(const std::string& file, int line, const std::string& k
 
 ConfigError::~ConfigError() = default;
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -5,7 +5,7 @@
 
 #include "agent/testing/TemporaryDirectory.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 using testing::TemporaryDirectory;
@@ -152,4 +152,4 @@ TEST_F(ConfigTest, TheEnvironmentNamesTheFile) {
 }
 
 }  // namespace
-}  // namespace zorvagent
+}  // namespace zorva::agent

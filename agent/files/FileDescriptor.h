@@ -5,7 +5,7 @@
 
 #include <utility>
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // Closes the descriptor at its end; -1 is none.
 class FileDescriptor {
@@ -29,4 +29,4 @@ class FileDescriptor {
   int descriptor_ = -1;
 };
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -10,7 +10,7 @@
 
 #include "agent/files/FileError.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 constexpr mode_t kLockMode = 0600;
@@ -48,4 +48,4 @@ FileLock::FileLock(FileDescriptor file, const std::string& path, Mode mode, Dead
 // A process that was forked meanwhile has the descriptor too, and closing ours alone would leave the lock held.
 FileLock::~FileLock() { ::flock(file_.get(), LOCK_UN); }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

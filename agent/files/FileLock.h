@@ -8,7 +8,7 @@
 
 #include "agent/files/FileDescriptor.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // A lock among processes, and among threads, by way of a file of its own that is never removed. Each object has its own
 // open file. Held until the object ends.
@@ -40,4 +40,4 @@ class FileLock {
 // Opens a lock's file for reading and writing, or makes it with these rights. errno says why there is none.
 FileDescriptor openLockFile(const std::string& path, mode_t rights);
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -13,7 +13,7 @@
 #include <tuple>
 #include <utility>
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 // In a directory: names that come and go, and permissions that change, also its own end.
@@ -178,4 +178,4 @@ bool FileWatch::concerns(int descriptor, const char* name) const {
   });
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -8,7 +8,7 @@
 
 #include "agent/files/FileDescriptor.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // At first it compares what the kernel says of each file; after many questions it goes over to inotify, with which a
 // question costs a third. (To begin with inotify would cost a short-lived program dear: when a process with watches
@@ -67,4 +67,4 @@ class FileWatch {
   bool blind_ = false;  // something cannot be watched
 };
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

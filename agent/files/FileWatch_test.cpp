@@ -11,7 +11,7 @@
 
 #include "agent/testing/TemporaryDirectory.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 using testing::succeedsInChild;
@@ -259,4 +259,4 @@ TEST(FileReports, WithoutInotifyEverythingMayAlwaysHaveChanged) {
 }
 
 }  // namespace
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -1,6 +1,6 @@
 #include "agent/files/Lines.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 std::string_view takeLine(std::string_view& text) {
   const std::size_t end = text.find('\n');
@@ -22,4 +22,4 @@ std::vector<std::string> wordsOf(std::string_view line) {
   return words;
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

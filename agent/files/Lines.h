@@ -5,7 +5,7 @@
 #include <string_view>
 #include <vector>
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // Takes the first line off the text, without its end, LF or CRLF.
 std::string_view takeLine(std::string_view& text);
@@ -13,4 +13,4 @@ std::string_view takeLine(std::string_view& text);
 // The words of a line, which blanks and tabs part, up to a word that begins with "#" or ";".
 std::vector<std::string> wordsOf(std::string_view line);
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

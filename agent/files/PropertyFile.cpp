@@ -20,10 +20,10 @@ PropertyFile::~PropertyFile() = default;
 
 bool PropertyFile::open(unsigned long) {
   entries_.clear();
-  const zorvagent::FileText file = zorvagent::readFile(path_, kLargestFile);
+  const zorva::agent::FileText file = zorva::agent::readFile(path_, kLargestFile);
   if (file.error != 0 || file.truncated) return false;
   for (std::string_view rest = file.text; !rest.empty();) {
-    const std::string_view line = zorvagent::takeLine(rest);
+    const std::string_view line = zorva::agent::takeLine(rest);
     const std::size_t split = line.find('=');
     if (line.starts_with('#') || split == std::string_view::npos) continue;
     entries_.push_back({std::string(line.substr(0, split)), std::string(line.substr(split + 1))});

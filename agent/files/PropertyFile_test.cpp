@@ -9,7 +9,7 @@
 
 namespace {
 
-using zorvagent::testing::TemporaryDirectory;
+using zorva::agent::testing::TemporaryDirectory;
 using ZV::make_wstring;
 using ZV::PropertyFile;
 

@@ -11,7 +11,7 @@
 
 #include "agent/files/FileDescriptor.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 constexpr std::size_t kFirstRoom = 4096;
@@ -54,4 +54,4 @@ std::string fileErrorText(int error) {
   return std::generic_category().message(error);
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

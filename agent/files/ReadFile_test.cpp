@@ -6,7 +6,7 @@
 
 #include "agent/testing/TemporaryDirectory.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 using testing::TemporaryDirectory;
@@ -47,4 +47,4 @@ TEST(ReadFile, SaysWhatIsWrong) {
 }
 
 }  // namespace
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -11,7 +11,7 @@
 #include "agent/files/FileError.h"
 #include "agent/log/LogOutput.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 constexpr mode_t kFileMode = 0644;
@@ -86,4 +86,4 @@ bool syncFile(const std::string& path) {
   return file && ::fsync(file.get()) == 0;
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -5,7 +5,7 @@
 
 #include <string>
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // Puts a file with that text in the place of directory + name, by way of a synced temporary file beside it. One writer
 // at a time: the caller holds a lock. The file is for all to read, or has the owner and the rights of `like`, as far as
@@ -20,4 +20,4 @@ void overwriteFile(const std::string& path, const std::string& text);
 // Syncs a file. False, with errno, where that fails.
 bool syncFile(const std::string& path);
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

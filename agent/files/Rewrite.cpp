@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <iterator>
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 // What ends with "=" begins a line that was given a new value.
@@ -56,4 +56,4 @@ Rewrite compareRewrite(std::string_view before, std::string_view now) {
   return now.empty() ? Rewrite::Whole : Rewrite::Foreign;
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

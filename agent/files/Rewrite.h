@@ -3,7 +3,7 @@
 
 #include <string_view>
 
-namespace zorvagent {
+namespace zorva::agent {
 
 enum class Rewrite {
   Whole,     // every line is there, as it was or with a new value
@@ -16,4 +16,4 @@ enum class Rewrite {
 // holds one of the keys that can be changed.
 Rewrite compareRewrite(std::string_view before, std::string_view now);
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

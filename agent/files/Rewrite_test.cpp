@@ -4,7 +4,7 @@
 
 #include <string>
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 const std::string kBefore = "# settings\nHOSTNAME=host1\nDOMAINNAME=example.org\nMTU=1500\nDNSSERVERS=192.0.2.53 \n";
@@ -55,4 +55,4 @@ TEST(CompareRewrite, WhatSomebodyElseWroteIsForeign) {
 }
 
 }  // namespace
-}  // namespace zorvagent
+}  // namespace zorva::agent

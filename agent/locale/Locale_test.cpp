@@ -12,15 +12,15 @@ using ZV::Locale::getResourceLibrary;
 
 class Locale : public ::testing::Test {
  protected:
-  ~Locale() override { zorvagent::reset(); }
+  ~Locale() override { zorva::agent::reset(); }
 };
 
 constexpr unsigned long kDnsClientLibrary = 2;
 
 TEST_F(Locale, TheLanguageIsThatOfTheConfiguration) {
-  zorvagent::Config config;
+  zorva::agent::Config config;
   config.language = "de";
-  zorvagent::setConfig(config);
+  zorva::agent::setConfig(config);
   EXPECT_EQ(getLanguageId(), "de");
 }
 

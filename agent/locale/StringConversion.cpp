@@ -20,7 +20,7 @@ std::wstring make_wstring(const std::string& text) {
   std::wstring wide;
   wide.reserve(text.size());
   for (std::size_t place = 0; place < text.size();) {
-    const auto [character, length, valid] = zorvagent::decodeUtf8(text, place);
+    const auto [character, length, valid] = zorva::agent::decodeUtf8(text, place);
     const char32_t byte = kByteBase + static_cast<unsigned char>(text[place]);
     wide += static_cast<wchar_t>(valid ? character : byte);
     place += length;
@@ -40,7 +40,7 @@ std::string make_string(const std::wstring& text) {
     if (isByte(character)) {
       narrow += static_cast<char>(static_cast<unsigned char>(character - kByteBase));
     } else {
-      zorvagent::appendUtf8(narrow, isScalar(character) ? character : kReplacement);
+      zorva::agent::appendUtf8(narrow, isScalar(character) ? character : kReplacement);
     }
   }
   return narrow;

@@ -1,6 +1,6 @@
 #include "agent/locale/Utf8.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 unsigned int byteAt(std::string_view text, std::size_t place) { return static_cast<unsigned char>(text[place]); }
@@ -55,4 +55,4 @@ void appendUtf8(std::string& text, char32_t character) {
   }
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

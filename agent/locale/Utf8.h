@@ -5,7 +5,7 @@
 #include <string>
 #include <string_view>
 
-namespace zorvagent {
+namespace zorva::agent {
 
 struct Utf8Character {
   char32_t character = 0;
@@ -20,4 +20,4 @@ Utf8Character decodeUtf8(std::string_view text, std::size_t place);
 // Appends a character's UTF-8 form.
 void appendUtf8(std::string& text, char32_t character);
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

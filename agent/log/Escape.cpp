@@ -2,7 +2,7 @@
 
 #include "agent/locale/Utf8.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 bool isPlain(char c) { return c >= 0x20 && c < 0x7F; }
@@ -52,4 +52,4 @@ void appendEscaped(std::string& line, std::string_view text) {
   }
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -2,7 +2,7 @@
 
 #include <gtest/gtest.h>
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 std::string escaped(std::string_view text) {
@@ -27,4 +27,4 @@ TEST(Escape, ControlCharactersAreWrittenOut) {
 TEST(Escape, BytesThatAreNoUtf8AreWrittenOut) { EXPECT_EQ(escaped("\xFF\x80\xC3"), "\\xff\\x80\\xc3"); }
 
 }  // namespace
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -23,7 +23,7 @@
 #include <spdlog/sinks/base_sink.h>
 #include <spdlog/sinks/syslog_sink.h>
 
-namespace zorvagent {
+namespace zorva::agent {
 
 constinit std::atomic<int> logThreshold{std::numeric_limits<int>::min()};
 constinit std::atomic<int> traceThreshold{std::numeric_limits<int>::min()};
@@ -260,4 +260,4 @@ void lockLog() { outputMutex.lock(); }
 
 void unlockLog() { outputMutex.unlock(); }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -6,7 +6,7 @@
 
 #include "agent/log/LogSink.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // The level below which a stream drops lines. Starts so low that the first line goes on to the place where the
 // configuration is asked.
@@ -27,7 +27,7 @@ void logOwn(int level, const char* function, const char* file, int line, const s
 inline constexpr int kLevelError = 6000;
 
 #define ZORVAGENT_LOG_ERROR(message) \
-  ::zorvagent::logOwn(::zorvagent::kLevelError, static_cast<const char*>(__func__), __FILE__, __LINE__, (message))
+  zorva::agent::logOwn(zorva::agent::kLevelError, static_cast<const char*>(__func__), __FILE__, __LINE__, (message))
 
 // Change a stream at run time. The target is "stderr", "syslog", "off" or the path of a file that is appended to;
 // std::runtime_error, with the reason, where that cannot be opened, and the target stays.
@@ -41,4 +41,4 @@ void resetLog();
 void lockLog();
 void unlockLog();
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

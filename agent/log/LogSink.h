@@ -5,7 +5,7 @@
 
 #include "agent/interface/AgentApi.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 enum class LogStream { Log, Trace };
 
@@ -40,4 +40,4 @@ class LogSink {
 // caller's and must live until then. Thread-safe.
 ZORVA_AGENT_API void setLogSink(LogSink* sink);
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -17,18 +17,18 @@
 namespace {
 
 using ZALog::ZALogger;
-using zorvagent::LogStream;
-using zorvagent::testing::contentsOf;
-using zorvagent::testing::TemporaryDirectory;
+using zorva::agent::LogStream;
+using zorva::agent::testing::contentsOf;
+using zorva::agent::testing::TemporaryDirectory;
 
 class ZALoggerTest : public ::testing::Test {
  protected:
   ZALoggerTest() {
     config_.logTarget = directory_ / "log";
     config_.traceTarget = directory_ / "trace";
-    zorvagent::setConfig(config_);
+    zorva::agent::setConfig(config_);
   }
-  ~ZALoggerTest() override { zorvagent::reset(); }
+  ~ZALoggerTest() override { zorva::agent::reset(); }
 
   static void log(int level, const std::string& message) {
     ZALogger::logLevelMessage("work", "agent/Work.cpp", 12, "Zorvagent.Test", level, nullptr, 0, 0, message);
@@ -40,7 +40,7 @@ class ZALoggerTest : public ::testing::Test {
   std::string traced() { return contentsOf(directory_ / "trace"); }
 
   TemporaryDirectory directory_;
-  zorvagent::Config config_;
+  zorva::agent::Config config_;
 };
 
 TEST_F(ZALoggerTest, ALineHasTimeLevelCategoryFunctionFileLineAndText) {
@@ -61,7 +61,7 @@ TEST_F(ZALoggerTest, LinesBelowTheLevelAreDropped) {
 }
 
 TEST_F(ZALoggerTest, TheTwoStreamsHaveTargetsAndLevelsOfTheirOwn) {
-  zorvagent::setLogLevel(LogStream::Trace, 3000);
+  zorva::agent::setLogLevel(LogStream::Trace, 3000);
   log(3000, "to the log");
   trace(3000, "to the trace");
   EXPECT_EQ(logged(), "");
@@ -91,11 +91,11 @@ TEST_F(ZALoggerTest, ALongMessageIsOneLine) {
 }
 
 TEST_F(ZALoggerTest, TargetAndLevelCanBeChangedAtRunTime) {
-  zorvagent::setLogTarget(LogStream::Log, directory_ / "other");
-  zorvagent::setLogLevel(LogStream::Log, 1);
+  zorva::agent::setLogTarget(LogStream::Log, directory_ / "other");
+  zorva::agent::setLogLevel(LogStream::Log, 1);
   log(1, "low");
   EXPECT_NE(contentsOf(directory_ / "other").find("low"), std::string::npos);
-  zorvagent::setLogTarget(LogStream::Log, "off");
+  zorva::agent::setLogTarget(LogStream::Log, "off");
   log(6000, "dropped");
   EXPECT_EQ(contentsOf(directory_ / "other").find("dropped"), std::string::npos);
 }
@@ -103,7 +103,7 @@ TEST_F(ZALoggerTest, TargetAndLevelCanBeChangedAtRunTime) {
 TEST_F(ZALoggerTest, ATargetThatCannotBeOpenedIsRefusedAndTheOldOneStays) {
   ASSERT_EQ(::mkfifo((directory_ / "fifo").c_str(), 0600), 0);
   for (const std::string& target : {directory_ / "absent/log", directory_.path(), directory_ / "fifo"}) {
-    EXPECT_THROW(zorvagent::setLogTarget(LogStream::Log, target), std::runtime_error) << target;
+    EXPECT_THROW(zorva::agent::setLogTarget(LogStream::Log, target), std::runtime_error) << target;
   }
   log(6000, "still here");
   EXPECT_NE(logged().find("still here"), std::string::npos);
@@ -111,9 +111,9 @@ TEST_F(ZALoggerTest, ATargetThatCannotBeOpenedIsRefusedAndTheOldOneStays) {
 
 TEST_F(ZALoggerTest, AConfiguredTargetThatCannotBeOpenedIsToldOnceAndItsLinesAreLost) {
   config_.logTarget = directory_ / "absent/log";
-  zorvagent::setConfig(config_);
-  zorvagent::reset();
-  zorvagent::setConfig(config_);
+  zorva::agent::setConfig(config_);
+  zorva::agent::reset();
+  zorva::agent::setConfig(config_);
   ::testing::internal::CaptureStderr();
   log(6000, "lost");
   log(6000, "lost too");
@@ -124,22 +124,22 @@ TEST_F(ZALoggerTest, AConfiguredTargetThatCannotBeOpenedIsToldOnceAndItsLinesAre
 
 TEST_F(ZALoggerTest, StandardErrorIsATarget) {
   ::testing::internal::CaptureStderr();
-  zorvagent::setLogTarget(LogStream::Log, "stderr");
+  zorva::agent::setLogTarget(LogStream::Log, "stderr");
   log(6000, "seen");
   EXPECT_NE(::testing::internal::GetCapturedStderr().find("Zorvagent.Test work agent/Work.cpp:12 seen\n"),
             std::string::npos);
 }
 
 TEST_F(ZALoggerTest, SyslogIsATarget) {
-  zorvagent::setLogTarget(LogStream::Log, "syslog");
+  zorva::agent::setLogTarget(LogStream::Log, "syslog");
   log(6000, "to whom it may concern");
   EXPECT_EQ(logged(), "");
 }
 
 TEST_F(ZALoggerTest, AFullDiskLosesTheLineAndNothingElse) {
-  zorvagent::setLogTarget(LogStream::Log, "/dev/full");
+  zorva::agent::setLogTarget(LogStream::Log, "/dev/full");
   log(6000, "lost");
-  zorvagent::setLogTarget(LogStream::Log, directory_ / "log");
+  zorva::agent::setLogTarget(LogStream::Log, directory_ / "log");
   log(6000, "kept");
   EXPECT_NE(logged().find("kept"), std::string::npos);
 }
@@ -163,8 +163,8 @@ TEST_F(ZALoggerTest, LinesOfManyThreadsStayWhole) {
 }
 
 TEST_F(ZALoggerTest, ASinkTakesEveryCallWhateverItsLevelAndNoLineGoesOut) {
-  struct Recorder : zorvagent::LogSink {
-    void record(const zorvagent::LogCall& call) override {
+  struct Recorder : zorva::agent::LogSink {
+    void record(const zorva::agent::LogCall& call) override {
       calls.push_back(std::to_string(static_cast<int>(call.stream)) + ' ' + call.function + ' ' + call.file + ':' +
                       std::to_string(call.line) + ' ' + call.category + ' ' + std::to_string(call.level) + ' ' +
                       call.message);
@@ -173,10 +173,10 @@ TEST_F(ZALoggerTest, ASinkTakesEveryCallWhateverItsLevelAndNoLineGoesOut) {
     std::vector<std::string> calls;
     bool reservedAreUnset = false;
   } recorder;
-  zorvagent::setLogSink(&recorder);
+  zorva::agent::setLogSink(&recorder);
   log(1, "a");
   trace(9000, "b");
-  zorvagent::setLogSink(nullptr);
+  zorva::agent::setLogSink(nullptr);
   log(1, "after");
   EXPECT_EQ(recorder.calls, (std::vector<std::string>{"0 work agent/Work.cpp:12 Zorvagent.Test 1 a",
                                                       "1 work agent/Work.cpp:12 Zorvagent.Test 9000 b"}));
@@ -185,12 +185,12 @@ TEST_F(ZALoggerTest, ASinkTakesEveryCallWhateverItsLevelAndNoLineGoesOut) {
 }
 
 TEST_F(ZALoggerTest, ASinkThatThrowsUpsetsNobody) {
-  struct Thrower : zorvagent::LogSink {
-    void record(const zorvagent::LogCall&) override { throw 42; }
+  struct Thrower : zorva::agent::LogSink {
+    void record(const zorva::agent::LogCall&) override { throw 42; }
   } thrower;
-  zorvagent::setLogSink(&thrower);
+  zorva::agent::setLogSink(&thrower);
   EXPECT_NO_THROW(log(6000, "a"));
-  zorvagent::setLogSink(nullptr);
+  zorva::agent::setLogSink(nullptr);
 }
 
 }  // namespace

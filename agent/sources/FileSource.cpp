@@ -4,7 +4,7 @@
 
 #include "agent/tree/TreeJson.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 FileSource::FileSource(std::string path) : path_(std::move(path)) {}
 
@@ -17,4 +17,4 @@ std::shared_ptr<const TreeSnapshot> FileSource::read() {
 
 void FileSource::reopen() { watch_ = FileWatch(); }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

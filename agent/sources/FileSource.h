@@ -6,7 +6,7 @@
 #include "agent/files/FileWatch.h"
 #include "agent/tree/TreeSource.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 class FileSource : public TreeSource {
  public:
@@ -24,4 +24,4 @@ class FileSource : public TreeSource {
   FileWatch watch_;
 };
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -6,7 +6,7 @@
 
 #include "agent/files/Lines.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 bool equalNames(const std::string& left, const std::string& right) {
@@ -50,4 +50,4 @@ HostNames findHostNames(const std::string& nodeName, std::string_view hosts, con
   return names;
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

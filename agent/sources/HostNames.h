@@ -6,7 +6,7 @@
 
 #include "agent/sources/ResolvConf.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 struct HostNames {
   std::string host;    // up to the first dot of the kernel's node name
@@ -18,4 +18,4 @@ struct HostNames {
 // "domain" says, else the first of its search list. No resolver is asked: that could block.
 HostNames findHostNames(const std::string& nodeName, std::string_view hosts, const ResolvConf& conf);
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -2,7 +2,7 @@
 
 #include <gtest/gtest.h>
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 std::string domainOf(const std::string& nodeName, const std::string& hosts, const std::string& resolvConf = "") {
@@ -44,4 +44,4 @@ TEST(HostNames, ResolvConfTellsTheDomainLast) {
 TEST(HostNames, AnEmptyNodeNameHasNoDomain) { EXPECT_EQ(domainOf("", "192.0.2.1 x.example.org\n"), ""); }
 
 }  // namespace
-}  // namespace zorvagent
+}  // namespace zorva::agent

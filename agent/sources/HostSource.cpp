@@ -10,7 +10,7 @@
 
 #include "agent/files/ReadFile.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 using namespace ZV::NodeLexicon;
@@ -169,4 +169,4 @@ std::string HostSource::product() {
   return product_;
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -9,7 +9,7 @@
 #include "agent/sources/Netlink.h"
 #include "agent/tree/TreeSource.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 struct HostSourceOptions {
   bool includeLoopback = false;
@@ -63,4 +63,4 @@ class HostSource : public TreeSource {
   std::string product_;  // empty until it is read
 };
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -19,7 +19,7 @@
 #include "agent/testing/NetworkNamespace.h"
 #include "agent/testing/TemporaryDirectory.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 using namespace ZV::NodeLexicon;
@@ -430,4 +430,4 @@ TEST(AddressOrigins, AreToldByRangeProtocolFlagsAndPrefix) {
 }
 
 }  // namespace
-}  // namespace zorvagent
+}  // namespace zorva::agent

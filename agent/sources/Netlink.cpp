@@ -16,7 +16,7 @@
 #include <stdexcept>
 #include <system_error>
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 // What the kernel fills at most in one go.
@@ -252,4 +252,4 @@ LinkReader::DumpResult LinkReader::receive(const Handler& handle) {
   }
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -10,7 +10,7 @@
 
 #include "agent/tree/Node.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // An open netlink socket, close-on-exec.
 using NetlinkSocket = std::unique_ptr<mnl_socket, decltype(&mnl_socket_close)>;
@@ -77,4 +77,4 @@ class LinkReader {
 // Where the kernel has an address from; flags are those of IFA_FLAGS, protocol that of IFA_PROTO or 0.
 AddressOrigin originOf(const InterfaceAddress& address, unsigned int flags, unsigned int protocol);
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -5,7 +5,7 @@
 #include "agent/files/Lines.h"
 #include "agent/tree/IpAddress.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 bool isServer(const std::string& text) {
@@ -48,4 +48,4 @@ bool namesOnlyLocalStub(const ResolvConf& conf) {
   return !conf.servers.empty() && std::all_of(conf.servers.begin(), conf.servers.end(), isStub);
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -6,7 +6,7 @@
 
 #include "agent/tree/Node.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // The contents of a resolv.conf(5) as the resolver takes them: a keyword counts at the very beginning of a line alone,
 // of "domain" and "search" the last one counts, lines that begin with "#" or ";" are comments, a name server that is no
@@ -24,4 +24,4 @@ ResolvConf parseResolvConf(std::string_view text);
 // True where the only servers are the stub that systemd-resolved listens on: whom it asks in turn is told elsewhere.
 bool namesOnlyLocalStub(const ResolvConf& conf);
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -2,7 +2,7 @@
 
 #include <gtest/gtest.h>
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 StringList serversIn(const std::string& text) { return parseResolvConf(text).servers; }
@@ -76,4 +76,4 @@ TEST(ResolvConf, TheLocalStubIsKnownWhereItStandsAlone) {
 }
 
 }  // namespace
-}  // namespace zorvagent
+}  // namespace zorva::agent

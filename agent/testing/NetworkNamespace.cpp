@@ -14,7 +14,7 @@
 
 #include "agent/testing/TemporaryDirectory.h"
 
-namespace zorvagent::testing {
+namespace zorva::agent::testing {
 namespace {
 
 // A request in the making: a message with room for its attributes.
@@ -150,4 +150,4 @@ void Interfaces::addAddress(const std::string& name, const std::string& address,
   send(message, "an address cannot be added");
 }
 
-}  // namespace zorvagent::testing
+}  // namespace zorva::agent::testing

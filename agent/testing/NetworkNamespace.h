@@ -6,7 +6,7 @@
 #include <memory>
 #include <string>
 
-namespace zorvagent::testing {
+namespace zorva::agent::testing {
 
 // Moves the calling process, which should be a child made for that, into a new and empty network namespace with a user
 // namespace around it where that is needed. False where the kernel does not permit it.
@@ -40,9 +40,9 @@ class Interfaces {
 };
 
 #define ZORVAGENT_NEEDS_NETWORK_NAMESPACE()                                                                      \
-  if (!::zorvagent::testing::canMakeNetworks()) {                                                                \
+  if (!zorva::agent::testing::canMakeNetworks()) {                                                               \
     GTEST_SKIP() << "this kernel or container permits no new network namespace, which this test makes links in"; \
   }                                                                                                              \
   static_assert(true, "a semicolon ends it")
 
-}  // namespace zorvagent::testing
+}  // namespace zorva::agent::testing

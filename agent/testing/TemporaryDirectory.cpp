@@ -7,7 +7,7 @@
 #include <stdexcept>
 #include <system_error>
 
-namespace zorvagent::testing {
+namespace zorva::agent::testing {
 
 namespace fs = std::filesystem;
 
@@ -44,4 +44,4 @@ std::string contentsOf(const std::string& path) {
   return text.str();
 }
 
-}  // namespace zorvagent::testing
+}  // namespace zorva::agent::testing

@@ -9,7 +9,7 @@
 #include <exception>
 #include <string>
 
-namespace zorvagent::testing {
+namespace zorva::agent::testing {
 
 // Made under the system's temporary directory, removed with all that is in it at the end.
 class TemporaryDirectory {
@@ -55,10 +55,10 @@ bool succeedsInChild(Work work) {
   return succeeded(startChild(work));
 }
 
-}  // namespace zorvagent::testing
+}  // namespace zorva::agent::testing
 
 template <typename Work>
-pid_t zorvagent::testing::startChild(Work work) {
+pid_t zorva::agent::testing::startChild(Work work) {
   const pid_t child = ::fork();
   if (child == 0) {
     bool good = false;
@@ -73,7 +73,7 @@ pid_t zorvagent::testing::startChild(Work work) {
   return child;
 }
 
-bool zorvagent::testing::succeeded(pid_t child) {
+bool zorva::agent::testing::succeeded(pid_t child) {
   int status = 0;
   return child > 0 && ::waitpid(child, &status, 0) == child && WIFEXITED(status) && WEXITSTATUS(status) == 0;
 }

@@ -5,7 +5,7 @@
 #include "agent/Runtime.h"
 #include "agent/Seams.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 constinit std::atomic<TreeCallHook*> treeCallHook{nullptr};
@@ -19,16 +19,16 @@ void announce(TreeCall call) {
 
 void setTreeCallHook(TreeCallHook* hook) { treeCallHook.store(hook, std::memory_order_release); }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent
 
 namespace ZV {
 
-using zorvagent::announce;
-using zorvagent::Node;
-using zorvagent::NodeType;
-using zorvagent::Runtime;
-using zorvagent::TreeCall;
-using zorvagent::TreeSnapshot;
+using zorva::agent::announce;
+using zorva::agent::Node;
+using zorva::agent::NodeType;
+using zorva::agent::Runtime;
+using zorva::agent::TreeCall;
+using zorva::agent::TreeSnapshot;
 
 struct Instrumentation::Position {
   std::shared_ptr<const TreeSnapshot> snapshot;
@@ -115,7 +115,7 @@ bool Instrumentation::getProperty(NodeLexicon::Properties property, unsigned int
 bool Instrumentation::getProperty(NodeLexicon::Properties property, std::vector<std::string>& value) const {
   announce(TreeCall::GetList);
   if (position_ == nullptr || position_->node == nullptr) return false;
-  const zorvagent::StringList* list = position_->node->list(property);
+  const zorva::agent::StringList* list = position_->node->list(property);
   if (list != nullptr) value = *list;
   return list != nullptr;
 }
@@ -129,7 +129,7 @@ bool Instrumentation::setProperty(NodeLexicon::Properties property, std::string&
 bool Instrumentation::setProperty(NodeLexicon::Properties property, std::vector<std::string> value) {
   announce(TreeCall::SetList);
   if (position_ == nullptr || position_->node == nullptr) return false;
-  const auto list = std::make_shared<const zorvagent::StringList>(std::move(value));
+  const auto list = std::make_shared<const zorva::agent::StringList>(std::move(value));
   return Runtime::instance().store(position_->node->path(), property, list);
 }
 

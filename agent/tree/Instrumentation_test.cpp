@@ -15,7 +15,7 @@ namespace {
 using namespace ZV::NodeLexicon;
 using ::testing::ElementsAre;
 using ::testing::SizeIs;
-using zorvagent::TreeCall;
+using zorva::agent::TreeCall;
 using ZV::Instrumentation;
 
 static_assert(sizeof(Instrumentation) == sizeof(void*), "its size never changes with the agent");
@@ -31,16 +31,16 @@ constexpr const char* kTwoInterfaces = R"({"system_name": "host1", "nodes": [
 class InstrumentationTest : public ::testing::Test {
  protected:
   InstrumentationTest() {
-    zorvagent::Config config;
+    zorva::agent::Config config;
     config.dataDir = directory_.path();
     config.logTarget = directory_ / "log";
-    zorvagent::setConfig(config);
+    zorva::agent::setConfig(config);
     install(kTwoInterfaces);
   }
-  ~InstrumentationTest() override { zorvagent::reset(); }
+  ~InstrumentationTest() override { zorva::agent::reset(); }
 
   static void install(const std::string& json) {
-    zorvagent::setTreeSource(std::make_shared<zorvagent::FixedSource>(zorvagent::treeFromJson(json, "tree")));
+    zorva::agent::setTreeSource(std::make_shared<zorva::agent::FixedSource>(zorva::agent::treeFromJson(json, "tree")));
   }
 
   static std::string nameAt(const Instrumentation& cursor) {
@@ -48,7 +48,7 @@ class InstrumentationTest : public ::testing::Test {
     return cursor.getProperty(PROP_NAME, name) ? name : "none";
   }
 
-  zorvagent::testing::TemporaryDirectory directory_;
+  zorva::agent::testing::TemporaryDirectory directory_;
 };
 
 TEST_F(InstrumentationTest, ANewCursorStandsOnNoNode) {
@@ -175,9 +175,9 @@ TEST_F(InstrumentationTest, ACursorStaysInItsSnapshotWhenTheTreeChanges) {
   EXPECT_FALSE(fresh) << "a cursor without a snapshot uses the latest one";
 }
 
-struct FailingSource : zorvagent::TreeSource {
+struct FailingSource : zorva::agent::TreeSource {
   bool changed() override { return true; }
-  std::shared_ptr<const zorvagent::TreeSnapshot> read() override {
+  std::shared_ptr<const zorva::agent::TreeSnapshot> read() override {
     if (problem.empty()) throw 42;
     throw std::runtime_error(problem);
   }
@@ -185,13 +185,13 @@ struct FailingSource : zorvagent::TreeSource {
 };
 
 TEST_F(InstrumentationTest, ASourceThatThrowsLeavesTheCursorWhereItWasWhereAProgramAskedForThat) {
-  zorvagent::askForExceptions();
+  zorva::agent::askForExceptions();
   Instrumentation cursor;
   cursor.selectNode(NODE_NETWORK_IP_CONFIG);
-  zorvagent::setTreeSource(std::make_shared<FailingSource>());
+  zorva::agent::setTreeSource(std::make_shared<FailingSource>());
   EXPECT_THROW(cursor.selectNode(NODE_NETWORK_IP_CONFIG), std::runtime_error);
   EXPECT_EQ(nameAt(cursor), "eth0");
-  EXPECT_NE(zorvagent::testing::contentsOf(directory_ / "log").find("the tree cannot be read: no kernel"),
+  EXPECT_NE(zorva::agent::testing::contentsOf(directory_ / "log").find("the tree cannot be read: no kernel"),
             std::string::npos);
 }
 
@@ -208,11 +208,11 @@ TEST_F(InstrumentationTest, ASourceThatThrowsElsePlacesTheCursorOnNoNodeAndLogsE
   };
   const auto logged = [this] {
     std::vector<std::string> reasons;
-    std::istringstream log(zorvagent::testing::contentsOf(directory_ / "log"));
+    std::istringstream log(zorva::agent::testing::contentsOf(directory_ / "log"));
     for (std::string line; std::getline(log, line);) reasons.push_back(line.substr(line.find("cannot be read")));
     return reasons;
   };
-  zorvagent::setTreeSource(source);
+  zorva::agent::setTreeSource(source);
   expectNone();
   expectNone();
   EXPECT_THAT(logged(), ElementsAre("cannot be read: no kernel"));
@@ -223,13 +223,13 @@ TEST_F(InstrumentationTest, ASourceThatThrowsElsePlacesTheCursorOnNoNodeAndLogsE
   install(kTwoInterfaces);
   cursor.selectNode(NODE_NETWORK_IP_CONFIG);
   EXPECT_EQ(nameAt(cursor), "eth0");
-  zorvagent::setTreeSource(source);
+  zorva::agent::setTreeSource(source);
   expectNone();
   EXPECT_THAT(logged(), SizeIs(3)) << "after it went well once the same reason is news";
 }
 
 TEST_F(InstrumentationTest, AHookIsAskedAtEveryCallAndWhatItThrowsLeavesTheCall) {
-  struct Hook : zorvagent::TreeCallHook {
+  struct Hook : zorva::agent::TreeCallHook {
     void before(TreeCall call) override {
       calls.push_back(call);
       if (call == failing) throw 42;
@@ -237,7 +237,7 @@ TEST_F(InstrumentationTest, AHookIsAskedAtEveryCallAndWhatItThrowsLeavesTheCall)
     std::vector<TreeCall> calls;
     TreeCall failing = TreeCall::GetText;
   } hook;
-  zorvagent::setTreeCallHook(&hook);
+  zorva::agent::setTreeCallHook(&hook);
   Instrumentation cursor;
   cursor.selectNode(NODE_NETWORK_IP_CONFIG);
   EXPECT_TRUE(static_cast<bool>(cursor));
@@ -245,7 +245,7 @@ TEST_F(InstrumentationTest, AHookIsAskedAtEveryCallAndWhatItThrowsLeavesTheCall)
   EXPECT_THROW(cursor.getProperty(PROP_NAME, text), int);
   hook.failing = TreeCall::SelectByType;
   EXPECT_THROW(cursor.selectNode(NODE_NETWORK_IP_CONFIG), int);
-  zorvagent::setTreeCallHook(nullptr);
+  zorva::agent::setTreeCallHook(nullptr);
   EXPECT_EQ(hook.calls, (std::vector<TreeCall>{TreeCall::Construct, TreeCall::SelectByType, TreeCall::Test,
                                                TreeCall::GetText, TreeCall::SelectByType}));
   EXPECT_EQ(nameAt(cursor), "eth0");

@@ -4,7 +4,7 @@
 
 #include <array>
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 bool isAddress(int family, const std::string& text) {
@@ -18,4 +18,4 @@ bool isIPv4Address(const std::string& text) { return isAddress(AF_INET, text); }
 
 bool isIPv6Address(const std::string& text) { return isAddress(AF_INET6, text); }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

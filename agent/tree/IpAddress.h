@@ -3,10 +3,10 @@
 
 #include <string>
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // Whether the whole text is an address as inet_pton takes it; without a zone.
 bool isIPv4Address(const std::string& text);
 bool isIPv6Address(const std::string& text);
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

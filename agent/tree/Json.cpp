@@ -9,7 +9,7 @@
 #include "agent/files/ReadFile.h"
 #include "agent/locale/Utf8.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 constexpr char32_t kByteBase = 0x10EE00;
@@ -293,4 +293,4 @@ std::string formatJson(const JsonValue& value) {
   return text + '\n';
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

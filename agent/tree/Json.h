@@ -9,7 +9,7 @@
 
 #include "agent/config/Config.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // A value of a document. Texts are the agent's bytes: what is no UTF-8 stands in the document as a character of a
 // private plane, U+10EE00 plus the byte, and so do the bytes of such a character, so that any bytes come back exactly.
@@ -54,4 +54,4 @@ JsonValue readJsonFile(const std::string& path);
 // The document as text, indented by two blanks, with a line feed at its end.
 std::string formatJson(const JsonValue& value);
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -1,6 +1,6 @@
 #include "agent/tree/Node.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 template <typename Value>
@@ -44,4 +44,4 @@ bool Node::isOverlaid(PropertyNumber number) const {
   return property != nullptr && property->overlaid;
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

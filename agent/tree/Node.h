@@ -11,7 +11,7 @@
 #include "agent/interface/AgentApi.h"
 #include "agent/interface/NodeLexicon.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // What a node is. The interface headers know the last one only; cursors reach the others by path.
 enum class NodeType : unsigned int {
@@ -106,4 +106,4 @@ class ZORVA_AGENT_API Node {
   std::vector<Property> properties_;
 };
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -12,7 +12,7 @@
 #include "agent/log/LogOutput.h"
 #include "agent/tree/TreeJson.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 using namespace ZV::NodeLexicon;
@@ -165,4 +165,4 @@ std::shared_ptr<const TreeSnapshot> OverlayReader::applyTo(const std::shared_ptr
   return builder == nullptr ? tree : builder->finish();
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -11,7 +11,7 @@
 #include "agent/files/FileWatch.h"
 #include "agent/tree/TreeSnapshot.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // By the path of a node, then by property.
 using OverlayValues = std::map<std::string, std::map<PropertyNumber, PropertyValue>>;
@@ -81,4 +81,4 @@ class OverlayReader {
   bool unreadable_ = false;
 };
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

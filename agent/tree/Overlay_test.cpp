@@ -16,7 +16,7 @@
 #include "agent/interface/Instrumentation.h"
 #include "agent/testing/TemporaryDirectory.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 using namespace ZV::NodeLexicon;
@@ -323,4 +323,4 @@ TEST_F(OverlayTest, ThreadsThatWriteAtTheSameTimeLoseNothing) {
 }
 
 }  // namespace
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -8,7 +8,7 @@
 #include <utility>
 
 #include "agent/tree/IpAddress.h"
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 using namespace ZV::NodeLexicon;
@@ -300,4 +300,4 @@ std::shared_ptr<const TreeSnapshot> treeFromJsonValue(const JsonValue& document,
   return builder.finish();
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

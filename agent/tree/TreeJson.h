@@ -8,7 +8,7 @@
 #include "agent/tree/Json.h"
 #include "agent/tree/TreeSnapshot.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 JsonValue treeToJsonValue(const TreeSnapshot& tree);
 
@@ -27,4 +27,4 @@ PropertyValue propertyFromJson(PropertyNumber number, const JsonValue& value, co
                                const std::string& key);
 JsonValue propertyToJson(const PropertyValue& value);
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

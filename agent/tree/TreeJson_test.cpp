@@ -10,7 +10,7 @@
 #include "agent/sources/FileSource.h"
 #include "agent/testing/TemporaryDirectory.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 using testing::TemporaryDirectory;
@@ -272,4 +272,4 @@ TEST(FileSource, ALargeFileIsRefused) {
 }
 
 }  // namespace
-}  // namespace zorvagent
+}  // namespace zorva::agent

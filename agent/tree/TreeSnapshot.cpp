@@ -3,7 +3,7 @@
 #include <stdexcept>
 #include <utility>
 
-namespace zorvagent {
+namespace zorva::agent {
 
 std::vector<const Node*> TreeSnapshot::children(const Node& node) const {
   std::vector<const Node*> result;
@@ -85,4 +85,4 @@ std::shared_ptr<const TreeSnapshot> TreeBuilder::finish() {
   return std::move(tree_);
 }
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -11,7 +11,7 @@
 #include "agent/interface/AgentApi.h"
 #include "agent/tree/Node.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // The tree as it was at one moment. Never changes once it is made, so any number of threads may read it; it lives as
 // long as somebody holds it.
@@ -80,4 +80,4 @@ class ZORVA_AGENT_API TreeBuilder {
   std::shared_ptr<TreeSnapshot> tree_;
 };
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -4,7 +4,7 @@
 
 #include <stdexcept>
 
-namespace zorvagent {
+namespace zorva::agent {
 namespace {
 
 using namespace ZV::NodeLexicon;
@@ -157,4 +157,4 @@ TEST(Node, ListsAreEqualByTheirElements) {
 }
 
 }  // namespace
-}  // namespace zorvagent
+}  // namespace zorva::agent

@@ -5,7 +5,7 @@
 
 #include "agent/tree/TreeSnapshot.h"
 
-namespace zorvagent {
+namespace zorva::agent {
 
 // The agent calls a source from one thread at a time. What a source throws, beyond std::bad_alloc, should be derived
 // from std::exception with a what() of one line that tells what could not be read and why: it reaches the caller of
@@ -37,4 +37,4 @@ class FixedSource : public TreeSource {
   std::shared_ptr<const TreeSnapshot> tree_;
 };
 
-}  // namespace zorvagent
+}  // namespace zorva::agent

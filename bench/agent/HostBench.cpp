@@ -31,13 +31,13 @@ Socket openSocket(unsigned int groups) {
 }
 
 void PlaceCursor(benchmark::State& state) {
-  zorvagent::setConfig(zorvagent::Config());
+  zorva::agent::setConfig(zorva::agent::Config());
   for (auto _ : state) {
     ZV::Instrumentation cursor;
     cursor.selectNode(ZV::NodeLexicon::NODE_NETWORK_IP_CONFIG);
     benchmark::DoNotOptimize(cursor);
   }
-  zorvagent::reset();
+  zorva::agent::reset();
 }
 BENCHMARK(PlaceCursor);
 
@@ -57,7 +57,7 @@ void BareReads(benchmark::State& state) {
 BENCHMARK(BareReads);
 
 void ReadHost(benchmark::State& state) {
-  zorvagent::HostSource source;
+  zorva::agent::HostSource source;
   source.read();  // what is opened once stays open
   for (auto _ : state) benchmark::DoNotOptimize(source.read());
 }

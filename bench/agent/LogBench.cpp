@@ -16,17 +16,17 @@ constexpr std::size_t kLine = 512;
 
 // Everything is dropped, as where log and trace are off.
 void dropAllLines() {
-  zorvagent::Config config;
+  zorva::agent::Config config;
   config.logTarget = "off";
   config.traceTarget = "off";
-  zorvagent::setConfig(config);
+  zorva::agent::setConfig(config);
   ZV::logMessage(category, ZV_HERE, ZV::LOG_LEVEL_FLOW, kText);
 }
 
 void LogPair(benchmark::State& state) {
   dropAllLines();
   for (auto _ : state) ZV::logMessage(category, ZV_HERE, ZV::LOG_LEVEL_DETAIL, kText);
-  zorvagent::reset();
+  zorva::agent::reset();
 }
 BENCHMARK(LogPair);
 
@@ -52,7 +52,7 @@ void EntryLineHalf(benchmark::State& state) {
     ZV::logEntry(category, ZV_HERE, " broker=", &a.onStack[0], " ctx=", &a.onStack[1], " rslt=", &a.onStack[2],
                  " ref=", &a.onHeap[0], " properties=", &a.onHeap[1], " status=", &a.onHeap[2]);
   }
-  zorvagent::reset();
+  zorva::agent::reset();
 }
 BENCHMARK(EntryLineHalf);
 

@@ -3,8 +3,8 @@
 #include <string>
 
 #include "schema/Mof.h"
+#include "server/BrokerLog.h"
 #include "server/Daemon.h"
-#include "server/Log.h"
 
 namespace {
 

@@ -49,7 +49,7 @@ class TestHost {
   /// Exit code 127: no such place can be made here.
   Outcome runOnFreshMachine(const std::vector<std::string>& words) const;
 
-  const zorvagent::testing::TemporaryDirectory& directory() const { return directory_; }
+  const zorva::agent::testing::TemporaryDirectory& directory() const { return directory_; }
   std::string dataFile(const std::string& name) const { return directory_ / "data/" + name; }
   void writeTree(const std::string& json) const;
 
@@ -64,7 +64,7 @@ class TestHost {
   Outcome runPrepared(const std::function<bool()>& prepare, const Environment& environment,
                       const std::vector<std::string>& words, OutputTo output) const;
 
-  zorvagent::testing::TemporaryDirectory directory_;
+  zorva::agent::testing::TemporaryDirectory directory_;
 };
 
 }  // namespace zorva::cli

@@ -488,10 +488,10 @@ class AssociationTest : public ::testing::Test {
   // The tree fails at each of its calls. A request may end as its exception has it where that was no std::exception,
   // or flew out of one of the calls that are named here.
   void expectToSurviveEveryTreeFailure(const std::vector<Request>& requests,
-                                       const std::set<zorvagent::TreeCall>& unguarded) {
+                                       const std::set<zorva::agent::TreeCall>& unguarded) {
     for (const Request& request : requests) {
       SCOPED_TRACE(request.name);
-      const std::vector<zorvagent::TreeCall> calls = treeCallsOf(request);
+      const std::vector<zorva::agent::TreeCall> calls = treeCallsOf(request);
       const std::size_t tried = forEachTreeFailure([&](std::size_t n, Thrown thrown) {
         SCOPED_TRACE(n);
         try {
@@ -507,7 +507,7 @@ class AssociationTest : public ::testing::Test {
   }
 
  private:
-  static std::vector<zorvagent::TreeCall> treeCallsOf(const Request& request) {
+  static std::vector<zorva::agent::TreeCall> treeCallsOf(const Request& request) {
     const FailingTree counting;
     request.run();
     return counting.calls();

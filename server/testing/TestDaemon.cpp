@@ -16,7 +16,7 @@ namespace zorva::server::testing {
 namespace {
 
 using Clock = std::chrono::steady_clock;
-using zorvagent::testing::contentsOf;
+using zorva::agent::testing::contentsOf;
 
 constexpr const char* kTree = R"({"system_name":"host1","nodes":[
   {"type":"System","name":"system","description":"Computer","children":[
@@ -67,15 +67,15 @@ TestDaemon::TestDaemon(const std::string& config, std::vector<std::string> argum
 
   int ends[2];
   if (::pipe2(ends, O_CLOEXEC) != 0) throw std::runtime_error("no pipe");
-  out_ = Descriptor(ends[0]);
-  Descriptor out(ends[1]);
-  const Descriptor err(::open((directory_ / "stderr").c_str(), O_WRONLY | O_CREAT | O_APPEND | O_CLOEXEC, 0600));
+  out_ = http::Descriptor(ends[0]);
+  http::Descriptor out(ends[1]);
+  const http::Descriptor err(::open((directory_ / "stderr").c_str(), O_WRONLY | O_CREAT | O_APPEND | O_CLOEXEC, 0600));
   process_ = ::fork();
   if (process_ == 0) {
     if (prepare) prepare();
     become(arguments, out.get(), err.get());
   }
-  out = Descriptor();
+  out = http::Descriptor();
 
   const std::string line = firstLine(out_.get(), std::chrono::seconds(60));
   const std::size_t end = line.find_first_of(" \n", line.find("http://"));
@@ -126,9 +126,9 @@ void TestDaemon::writeConfig(const std::string& config) const {
 }
 
 DaemonOutcome TestDaemon::run(const std::vector<std::string>& arguments) {
-  const zorvagent::testing::TemporaryDirectory directory;
-  const Descriptor out(::open((directory / "out").c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600));
-  const Descriptor err(::open((directory / "err").c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600));
+  const zorva::agent::testing::TemporaryDirectory directory;
+  const http::Descriptor out(::open((directory / "out").c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600));
+  const http::Descriptor err(::open((directory / "err").c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600));
   const pid_t process = ::fork();
   if (process == 0) become(arguments, out.get(), err.get());
   int status = 0;

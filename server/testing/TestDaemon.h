@@ -9,7 +9,7 @@
 #include <vector>
 
 #include "agent/testing/TemporaryDirectory.h"
-#include "server/Listener.h"
+#include "http/Listener.h"
 
 // For tests: zorvacimd itself, on a host that is a tree in a file.
 
@@ -34,7 +34,7 @@ class TestDaemon {
 
   int port() const { return port_; }
   pid_t process() const { return process_; }
-  const zorvagent::testing::TemporaryDirectory& directory() const { return directory_; }
+  const zorva::agent::testing::TemporaryDirectory& directory() const { return directory_; }
 
   void signal(int number) const;
 
@@ -51,9 +51,9 @@ class TestDaemon {
   static DaemonOutcome run(const std::vector<std::string>& arguments);
 
  private:
-  zorvagent::testing::TemporaryDirectory directory_;
+  zorva::agent::testing::TemporaryDirectory directory_;
   pid_t process_ = -1;
-  Descriptor out_;
+  http::Descriptor out_;
   int port_ = 0;
 };
 

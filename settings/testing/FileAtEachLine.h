@@ -11,20 +11,20 @@
 namespace ZV::Test {
 
 // What a file holds at each line of the log.
-class FileAtEachLine : private zorvagent::LogSink {
+class FileAtEachLine : private zorva::agent::LogSink {
  public:
   FileAtEachLine(const World& world, std::string interface) : world_(world), interface_(std::move(interface)) {
-    zorvagent::setLogSink(this);
+    zorva::agent::setLogSink(this);
   }
-  ~FileAtEachLine() override { zorvagent::setLogSink(nullptr); }
+  ~FileAtEachLine() override { zorva::agent::setLogSink(nullptr); }
   FileAtEachLine(const FileAtEachLine&) = delete;
   FileAtEachLine& operator=(const FileAtEachLine&) = delete;
 
   std::vector<std::optional<std::string>> contents;
 
  private:
-  void record(const zorvagent::LogCall& call) override {
-    if (call.stream == zorvagent::LogStream::Log) contents.push_back(world_.fileContent(interface_));
+  void record(const zorva::agent::LogCall& call) override {
+    if (call.stream == zorva::agent::LogStream::Log) contents.push_back(world_.fileContent(interface_));
   }
 
   const World& world_;

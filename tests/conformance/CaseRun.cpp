@@ -29,7 +29,7 @@ struct Observed {
   std::vector<std::string> changes;
   std::string ends;
   Calls calls;  // all of them, reads included
-  std::vector<zorvagent::TreeCall> treeCalls;
+  std::vector<zorva::agent::TreeCall> treeCalls;
 };
 
 // --- lines of the log
@@ -294,7 +294,7 @@ std::size_t placeOfCall(const Calls& calls, const Failure& failure, const IsOfKi
 std::size_t placeOf(const Failure& failure, const Observed& observed) {
   if (failure.isOfTree()) {
     return placeOfCall(observed.treeCalls, failure,
-                       [&failure](zorvagent::TreeCall call) { return call == failure.treeCall; });
+                       [&failure](zorva::agent::TreeCall call) { return call == failure.treeCall; });
   }
   return placeOfCall(observed.calls, failure,
                      [&failure](const RecordedCall& call) { return call.name == failure.call; });

@@ -81,21 +81,21 @@ Mode readMode(LineScanner& scanner) {
 
 struct TreeCallWord {
   const char* word;
-  zorvagent::TreeCall call;
+  zorva::agent::TreeCall call;
 };
 
 constexpr std::array kTreeCalls{
-    TreeCallWord{"construction", zorvagent::TreeCall::Construct},
-    TreeCallWord{"selection by type", zorvagent::TreeCall::SelectByType},
-    TreeCallWord{"selection by path", zorvagent::TreeCall::SelectByPath},
-    TreeCallWord{"test", zorvagent::TreeCall::Test},
-    TreeCallWord{"step", zorvagent::TreeCall::Advance},
-    TreeCallWord{"read of a text", zorvagent::TreeCall::GetText},
-    TreeCallWord{"read of a list", zorvagent::TreeCall::GetList},
-    TreeCallWord{"write of a text", zorvagent::TreeCall::SetText},
-    TreeCallWord{"write of a list", zorvagent::TreeCall::SetList},
-    TreeCallWord{"read of a parent", zorvagent::TreeCall::GetPathToParent},
-    TreeCallWord{"read of a description", zorvagent::TreeCall::GetDescription},
+    TreeCallWord{"construction", zorva::agent::TreeCall::Construct},
+    TreeCallWord{"selection by type", zorva::agent::TreeCall::SelectByType},
+    TreeCallWord{"selection by path", zorva::agent::TreeCall::SelectByPath},
+    TreeCallWord{"test", zorva::agent::TreeCall::Test},
+    TreeCallWord{"step", zorva::agent::TreeCall::Advance},
+    TreeCallWord{"read of a text", zorva::agent::TreeCall::GetText},
+    TreeCallWord{"read of a list", zorva::agent::TreeCall::GetList},
+    TreeCallWord{"write of a text", zorva::agent::TreeCall::SetText},
+    TreeCallWord{"write of a list", zorva::agent::TreeCall::SetList},
+    TreeCallWord{"read of a parent", zorva::agent::TreeCall::GetPathToParent},
+    TreeCallWord{"read of a description", zorva::agent::TreeCall::GetDescription},
 };
 
 // "fails call 2 of newArray: null" and "fails each newArray: null"

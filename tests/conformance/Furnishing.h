@@ -18,7 +18,7 @@ void furnish(World& world, const std::vector<WrittenLine>& lines);
 struct Failure {
   WrittenLine line;
   std::string call;  // the slot; empty for a call of the tree
-  zorvagent::TreeCall treeCall = zorvagent::TreeCall::Construct;
+  zorva::agent::TreeCall treeCall = zorva::agent::TreeCall::Construct;
   std::size_t n = 0;  // the n-th call of its kind in the request, or 0 for each
   Mode mode = Mode::ReturnNull;
   Thrown thrown = Thrown::StdException;

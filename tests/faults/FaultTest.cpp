@@ -122,7 +122,7 @@ FaultTest::Usual FaultTest::usual(const Request& request) {
   if (changesFiles) {
     usual.files = host_.files();
     host_.restore();
-    zorvagent::currentTree();  // so that the agent holds what it held before
+    zorva::agent::currentTree();  // so that the agent holds what it held before
   }
   broker_.startOver();
   return usual;

@@ -85,7 +85,7 @@ class FileFaults : public FaultTest {
       if (isFirst) continue;
       ASSERT_EQ(Kind::Modify, request.kind) << content;
       if (name == "overlay.json") {
-        EXPECT_NO_THROW(zorvagent::overlayEntries()) << content;  // whole, whichever of the values are in it
+        EXPECT_NO_THROW(zorva::agent::overlayEntries()) << content;  // whole, whichever of the values are in it
         continue;
       }
       ASSERT_TRUE(first != host_.filesAtFirst().end()) << "left behind";

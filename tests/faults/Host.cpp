@@ -14,7 +14,7 @@
 namespace ZV::Test {
 namespace {
 
-constexpr int kLooksUntilSettled = zorvagent::FileWatch::kComparisons + 2;
+constexpr int kLooksUntilSettled = zorva::agent::FileWatch::kComparisons + 2;
 
 const char* const kFileOfHost =
     "# written by a person\n"
@@ -63,7 +63,7 @@ Host::Host(Tree tree) {
     write(world_.dataDir() + kSetValuesFile, kSetValues);
   }
   world_.install();
-  for (int looks = 0; looks < kLooksUntilSettled; ++looks) zorvagent::currentTree();
+  for (int looks = 0; looks < kLooksUntilSettled; ++looks) zorva::agent::currentTree();
   filesAtFirst_ = files();
 }
 

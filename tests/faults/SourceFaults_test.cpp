@@ -18,29 +18,29 @@
 namespace ZV::Test {
 namespace {
 
-using zorvagent::testing::TemporaryDirectory;
+using zorva::agent::testing::TemporaryDirectory;
 
 class SourceFaults : public ::testing::Test {
  protected:
   SourceFaults() {
-    zorvagent::reset();
+    zorva::agent::reset();
     directory_.write("etc/resolv.conf", "nameserver 127.0.0.53\nsearch example.org\n");
     directory_.write("run/systemd/resolve/resolv.conf", "nameserver 192.0.2.53\n");
     directory_.write("etc/hosts", "127.0.0.1 localhost\n");
     directory_.write("sys/class/dmi/id/product_name", "Product\n");
   }
-  ~SourceFaults() override { zorvagent::reset(); }
+  ~SourceFaults() override { zorva::agent::reset(); }
 
   // Reads the tree from a new source with each call failing in turn, and then again without failures.
-  void failEachCall(const std::function<std::shared_ptr<zorvagent::TreeSource>()>& makeSource) {
-    const auto read = [&] { return zorvagent::treeToJson(*zorvagent::currentTree()); };
+  void failEachCall(const std::function<std::shared_ptr<zorva::agent::TreeSource>()>& makeSource) {
+    const auto read = [&] { return zorva::agent::treeToJson(*zorva::agent::currentTree()); };
     const auto start = [&] {
-      zorvagent::reset();
-      zorvagent::Config config;
+      zorva::agent::reset();
+      zorva::agent::Config config;
       config.dataDir = directory_.path();
       config.logTarget = "off";
-      zorvagent::setConfig(config);
-      zorvagent::setTreeSource(makeSource());
+      zorva::agent::setConfig(config);
+      zorva::agent::setTreeSource(makeSource());
     };
     start();
     const std::string usual = read();
@@ -70,31 +70,31 @@ class SourceFaults : public ::testing::Test {
 };
 
 TEST_F(SourceFaults, TheHostIsReadAgain) {
-  for (const int comparisons : {zorvagent::FileWatch::kComparisons, 0}) {
+  for (const int comparisons : {zorva::agent::FileWatch::kComparisons, 0}) {
     SCOPED_TRACE(comparisons);
     failEachCall([&] {
-      return std::make_shared<zorvagent::HostSource>(
-          zorvagent::HostSourceOptions{.includeLoopback = true, .root = directory_ / "", .comparisons = comparisons});
+      return std::make_shared<zorva::agent::HostSource>(zorva::agent::HostSourceOptions{
+          .includeLoopback = true, .root = directory_ / "", .comparisons = comparisons});
     });
   }
 }
 
 TEST_F(SourceFaults, ADocumentIsReadAgain) {
   const std::string path = directory_.write("tree.json", R"({ "system_name": "host1", "nodes": [] })");
-  failEachCall([&] { return std::make_shared<zorvagent::FileSource>(path); });
+  failEachCall([&] { return std::make_shared<zorva::agent::FileSource>(path); });
 }
 
 TEST_F(SourceFaults, ALogThatCannotBeWrittenStopsNothing) {
-  zorvagent::Config config;
+  zorva::agent::Config config;
   config.dataDir = directory_.path();
   config.logTarget = directory_ / "agent.log";
   config.logLevel = 0;
   std::size_t tried = 0;
   for (const FileFault fault : kAllFileFaults) {
     for (std::size_t n = 1;; ++n, ++tried) {
-      zorvagent::reset();
-      zorvagent::setConfig(config);
-      zorvagent::setTreeSource(std::make_shared<zorvagent::FixedSource>(World().host().nic("eth0").tree()));
+      zorva::agent::reset();
+      zorva::agent::setConfig(config);
+      zorva::agent::setTreeSource(std::make_shared<zorva::agent::FixedSource>(World().host().nic("eth0").tree()));
       const FailingFiles failing(n, fault);
       RecordingBroker broker;
       const Outcome outcome = requestsOf(allProviders().front()).front().run(broker);

@@ -8,13 +8,13 @@
 namespace ZV::Test {
 namespace {
 
-using zorvagent::TreeCall;
+using zorva::agent::TreeCall;
 
 // Takes down each call of the tree with its place among the lines of the log.
-class TreeCalls : private zorvagent::TreeCallHook {
+class TreeCalls : private zorva::agent::TreeCallHook {
  public:
-  TreeCalls() { zorvagent::setTreeCallHook(this); }
-  ~TreeCalls() override { zorvagent::setTreeCallHook(nullptr); }
+  TreeCalls() { zorva::agent::setTreeCallHook(this); }
+  ~TreeCalls() override { zorva::agent::setTreeCallHook(nullptr); }
   TreeCalls(const TreeCalls&) = delete;
   TreeCalls& operator=(const TreeCalls&) = delete;
 

@@ -48,7 +48,7 @@ class DocumentHost {
   DocumentHost& operator=(const DocumentHost&) = delete;
 
  private:
-  zorvagent::testing::TemporaryDirectory directory_;
+  zorva::agent::testing::TemporaryDirectory directory_;
 };
 
 // What other providers serve of that host.

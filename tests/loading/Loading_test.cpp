@@ -152,7 +152,7 @@ std::vector<std::string> linesOf(const std::string& path) {
   return lines;
 }
 
-Seen enumerateTwice(const zorvagent::testing::TemporaryDirectory& directory) {
+Seen enumerateTwice(const zorva::agent::testing::TemporaryDirectory& directory) {
   ::setenv("ZORVAGENT_CONFIG", (directory / "agent.toml").c_str(), 1);
   const int standardError = ::dup(STDERR_FILENO);
   const int file = ::open((directory / "stderr").c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600);
@@ -187,7 +187,7 @@ Seen enumerateTwice(const zorvagent::testing::TemporaryDirectory& directory) {
 }
 
 TEST(PlainLoader, AWrongConfigurationIsAnEmptyEnumerationWithALineToTheLogAndToSyslog) {
-  const zorvagent::testing::TemporaryDirectory directory;
+  const zorva::agent::testing::TemporaryDirectory directory;
   directory.write("agent.toml", "[agent]\nlangauge = \"en\"\n");
   const Seen seen = enumerateTwice(directory);
   const std::string reason = directory / "agent.toml:2: agent.langauge: is not a known key";
@@ -197,7 +197,7 @@ TEST(PlainLoader, AWrongConfigurationIsAnEmptyEnumerationWithALineToTheLogAndToS
 }
 
 TEST(PlainLoader, ATreeThatCannotBeReadIsAnEmptyEnumerationWithALineToTheLogAndToSyslog) {
-  const zorvagent::testing::TemporaryDirectory directory;
+  const zorva::agent::testing::TemporaryDirectory directory;
   directory.write("agent.toml", "[tree]\nsource = \"file\"\nfile = \"tree.json\"\n");
   directory.write("tree.json", "{\n\"system\": 1}");
   const Seen seen = enumerateTwice(directory);

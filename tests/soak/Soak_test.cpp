@@ -27,8 +27,8 @@ namespace {
 using std::chrono::milliseconds;
 using std::chrono::seconds;
 using std::chrono::steady_clock;
-using zorvagent::testing::Interfaces;
-using zorvagent::testing::TemporaryDirectory;
+using zorva::agent::testing::Interfaces;
+using zorva::agent::testing::TemporaryDirectory;
 
 constexpr unsigned int kClients = 8;
 constexpr seconds kLongestReply{30};  // under a sanitizer on a busy machine; what takes longer hangs
@@ -222,7 +222,7 @@ TEST(Soak, ClientsWhileADocumentChanges) {
 bool succeedsInNewNetwork(const char* test) {
   const pid_t child = ::fork();
   if (child == 0) {
-    if (!zorvagent::testing::enterNewNetwork()) ::_exit(1);
+    if (!zorva::agent::testing::enterNewNetwork()) ::_exit(1);
     ::setenv(kInside, "1", 1);
     const std::string filter = std::string("--gtest_filter=") + test;
     ::execl("/proc/self/exe", "soak_test", filter.c_str(), nullptr);

@@ -71,7 +71,7 @@ const char* nameOf(LineKind kind) {
 }
 
 std::string describe(const LogLine& line) {
-  return std::string(line.stream == zorvagent::LogStream::Log ? "log" : "trace") + " " + std::to_string(line.level) +
+  return std::string(line.stream == zorva::agent::LogStream::Log ? "log" : "trace") + " " + std::to_string(line.level) +
          " " + line.category + " " + line.function + " " + line.file + ":" + std::to_string(line.line) + " " +
          line.text;
 }
@@ -179,10 +179,10 @@ LogLines LogLines::pairs() const {
   for (std::size_t i = 0; i < size(); i += 2) {
     const LogLine& first = at(i);
     if (!first.reservedAreEmpty) throw BrokenPair("a reserved argument was given: " + describe(first));
-    if (first.stream != zorvagent::LogStream::Log) throw BrokenPair("nothing in the log before: " + describe(first));
+    if (first.stream != zorva::agent::LogStream::Log) throw BrokenPair("nothing in the log before: " + describe(first));
     if (i + 1 == size()) throw BrokenPair("no trace behind: " + describe(first));
     const LogLine& second = at(i + 1);
-    if (second.stream != zorvagent::LogStream::Trace || !second.reservedAreEmpty || !sameArguments(first, second)) {
+    if (second.stream != zorva::agent::LogStream::Trace || !second.reservedAreEmpty || !sameArguments(first, second)) {
       throw BrokenPair("the trace differs: " + describe(first) + "\n and then: " + describe(second));
     }
     halves.push_back(first);
@@ -251,12 +251,12 @@ RecordingLogger::RecordingLogger() {
 
 RecordingLogger::~RecordingLogger() {
   activeLogger = nullptr;
-  zorvagent::setLogSink(nullptr);
+  zorva::agent::setLogSink(nullptr);
 }
 
 RecordingLogger* RecordingLogger::active() { return activeLogger; }
 
-void RecordingLogger::resume() { zorvagent::setLogSink(this); }
+void RecordingLogger::resume() { zorva::agent::setLogSink(this); }
 
 LogLines RecordingLogger::lines() const { return linesSince(0); }
 
@@ -281,7 +281,7 @@ void RecordingLogger::clear() {
   ownLines_.clear();
 }
 
-void RecordingLogger::record(const zorvagent::LogCall& call) {
+void RecordingLogger::record(const zorva::agent::LogCall& call) {
   LogLine line;
   line.stream = call.stream;
   line.function = call.function == nullptr ? "" : call.function;

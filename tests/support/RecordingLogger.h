@@ -18,7 +18,7 @@ enum class LineKind { Banner, Entering, Exiting, Method, Message, Variable, Othe
 
 // One call of the logger.
 struct LogLine {
-  zorvagent::LogStream stream = zorvagent::LogStream::Log;
+  zorva::agent::LogStream stream = zorva::agent::LogStream::Log;
   std::string function;
   std::string file;
   int line = 0;
@@ -85,7 +85,7 @@ class LogLines : public std::vector<LogLine> {
 };
 
 // Takes the agent's log from its construction to its end; one at a time. Safe from several threads.
-class RecordingLogger : private zorvagent::LogSink {
+class RecordingLogger : private zorva::agent::LogSink {
  public:
   RecordingLogger();
   ~RecordingLogger() override;
@@ -105,7 +105,7 @@ class RecordingLogger : private zorvagent::LogSink {
   void clear();
 
  private:
-  void record(const zorvagent::LogCall& call) override;
+  void record(const zorva::agent::LogCall& call) override;
   void recordOwn(int level, const std::string& message) override;
 
   mutable std::mutex mutex_;

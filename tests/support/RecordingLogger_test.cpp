@@ -28,8 +28,8 @@ TEST(RecordingLogger, TakesTheLinesOfBothStreams) {
   pair(6000, "MESSAGE [File: model/File.cpp, Line: 7]: No ObjectPath Found");
   const LogLines lines = logger.lines();
   ASSERT_EQ(2U, lines.size());
-  EXPECT_EQ(zorvagent::LogStream::Log, lines[0].stream);
-  EXPECT_EQ(zorvagent::LogStream::Trace, lines[1].stream);
+  EXPECT_EQ(zorva::agent::LogStream::Log, lines[0].stream);
+  EXPECT_EQ(zorva::agent::LogStream::Trace, lines[1].stream);
   EXPECT_EQ("f", lines[0].function);
   EXPECT_EQ("model/File.cpp", lines[0].file);
   EXPECT_EQ(7, lines[0].line);

@@ -14,12 +14,12 @@ namespace ZV::Test {
 
 namespace {
 
-using zorvagent::NodeType;
-using zorvagent::PropertyNumber;
-using zorvagent::TreeBuilder;
-using zorvagent::TreeSnapshot;
+using zorva::agent::NodeType;
+using zorva::agent::PropertyNumber;
+using zorva::agent::TreeBuilder;
+using zorva::agent::TreeSnapshot;
 
-class UnreadableSource : public zorvagent::TreeSource {
+class UnreadableSource : public zorva::agent::TreeSource {
  public:
   explicit UnreadableSource(std::string reason) : reason_(std::move(reason)) {}
   bool changed() override { return true; }
@@ -50,7 +50,7 @@ void setNumber(TreeBuilder& builder, std::size_t node, PropertyNumber number, st
 }
 
 void setList(TreeBuilder& builder, std::size_t node, PropertyNumber number, const OptionalTexts& texts) {
-  if (texts.given()) builder.set(node, number, std::make_shared<const zorvagent::StringList>(texts.texts()));
+  if (texts.given()) builder.set(node, number, std::make_shared<const zorva::agent::StringList>(texts.texts()));
 }
 
 void setProperties(TreeBuilder& builder, std::size_t node, const std::string& name, const NicProperties& nic) {
@@ -62,15 +62,15 @@ void setProperties(TreeBuilder& builder, std::size_t node, const std::string& na
   setNumber(builder, node, NodeLexicon::PROP_PROTOCOL_IF_TYPE, nic.ifType);
   setNumber(builder, node, NodeLexicon::PROP_ENABLED_STATE, nic.state);
   if (!nic.addresses.empty()) {
-    builder.set(node, zorvagent::kAddresses, std::make_shared<const zorvagent::AddressList>(nic.addresses));
+    builder.set(node, zorva::agent::kAddresses, std::make_shared<const zorva::agent::AddressList>(nic.addresses));
   }
 }
 
 // The agent as in a new process of a program that catches what a provider throws; a logger that records goes on
 // recording.
 void forgetWorld() {
-  zorvagent::reset();
-  zorvagent::askForExceptions();
+  zorva::agent::reset();
+  zorva::agent::askForExceptions();
   if (RecordingLogger* logger = RecordingLogger::active()) logger->resume();
 }
 
@@ -112,16 +112,16 @@ World& World::nic(const std::string& name, const NicProperties& properties) {
 }
 
 void World::useConfig() const {
-  zorvagent::Config config;
+  zorva::agent::Config config;
   config.dataDir = dataDir_;
   config.logTarget = "off";
-  zorvagent::setConfig(config);
+  zorva::agent::setConfig(config);
 }
 
 World& World::install() {
   forgetWorld();
   useConfig();
-  zorvagent::setTreeSource(std::make_shared<zorvagent::FixedSource>(tree()));
+  zorva::agent::setTreeSource(std::make_shared<zorva::agent::FixedSource>(tree()));
   installed_ = true;
   return *this;
 }
@@ -129,7 +129,7 @@ World& World::install() {
 World& World::installUnreadable(const std::string& reason) {
   forgetWorld();
   useConfig();
-  zorvagent::setTreeSource(std::make_shared<UnreadableSource>(reason));
+  zorva::agent::setTreeSource(std::make_shared<UnreadableSource>(reason));
   installed_ = true;
   return *this;
 }
@@ -148,22 +148,22 @@ std::shared_ptr<const TreeSnapshot> World::tree() const {
   return builder.finish();
 }
 
-const zorvagent::Node* World::nodeOf(const TreeSnapshot& snapshot, std::size_t nic) const {
+const zorva::agent::Node* World::nodeOf(const TreeSnapshot& snapshot, std::size_t nic) const {
   const Nic& asked = nics_.at(nic);
   return snapshot.find("/" + systems_[asked.system].name + "/" + portName(asked.name, nic) + "/ip");
 }
 
 std::optional<std::string> World::text(std::size_t nic, PropertyNumber property) const {
-  const auto snapshot = zorvagent::currentTree();
-  const zorvagent::Node* node = nodeOf(*snapshot, nic);
+  const auto snapshot = zorva::agent::currentTree();
+  const zorva::agent::Node* node = nodeOf(*snapshot, nic);
   const std::string* held = node == nullptr ? nullptr : node->text(property);
   return held == nullptr ? std::nullopt : std::optional(*held);
 }
 
 std::optional<std::vector<std::string>> World::list(std::size_t nic, PropertyNumber property) const {
-  const auto snapshot = zorvagent::currentTree();
-  const zorvagent::Node* node = nodeOf(*snapshot, nic);
-  const zorvagent::StringList* held = node == nullptr ? nullptr : node->list(property);
+  const auto snapshot = zorva::agent::currentTree();
+  const zorva::agent::Node* node = nodeOf(*snapshot, nic);
+  const zorva::agent::StringList* held = node == nullptr ? nullptr : node->list(property);
   return held == nullptr ? std::nullopt : std::optional(*held);
 }
 
@@ -180,16 +180,16 @@ std::optional<std::string> World::fileContent(const std::string& nic) const {
   return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
 }
 
-FailingTree::FailingTree(std::size_t n, Thrown thrown) : n_(n), thrown_(thrown) { zorvagent::setTreeCallHook(this); }
+FailingTree::FailingTree(std::size_t n, Thrown thrown) : n_(n), thrown_(thrown) { zorva::agent::setTreeCallHook(this); }
 
-FailingTree::~FailingTree() { zorvagent::setTreeCallHook(nullptr); }
+FailingTree::~FailingTree() { zorva::agent::setTreeCallHook(nullptr); }
 
-std::vector<zorvagent::TreeCall> FailingTree::calls() const {
+std::vector<zorva::agent::TreeCall> FailingTree::calls() const {
   const std::lock_guard lock(mutex_);
   return calls_;
 }
 
-void FailingTree::before(zorvagent::TreeCall call) {
+void FailingTree::before(zorva::agent::TreeCall call) {
   const std::lock_guard lock(mutex_);
   calls_.push_back(call);
   if (calls_.size() != n_) return;

@@ -40,7 +40,7 @@ struct NicProperties {
   std::optional<unsigned int> ifType = {};
   std::optional<unsigned int> state = {};  // as the agent has it: 1 up with carrier, 12 without, 16 down
   bool isUnnamed = false;
-  std::vector<zorvagent::InterfaceAddress> addresses = {};
+  std::vector<zorva::agent::InterfaceAddress> addresses = {};
 };
 
 // An interface that has everything: host1 in example.org, one suffix, one server, up with carrier.
@@ -74,11 +74,11 @@ class World {
   // The agent finds a source of trees that throws a std::runtime_error with this text.
   World& installUnreadable(const std::string& reason = "the tree cannot be read");
 
-  std::shared_ptr<const zorvagent::TreeSnapshot> tree() const;
+  std::shared_ptr<const zorva::agent::TreeSnapshot> tree() const;
   // What the node of the n-th interface holds now, through the agent: values that were set included. Empty or no
   // value where the property is absent.
-  std::optional<std::string> text(std::size_t nic, zorvagent::PropertyNumber property) const;
-  std::optional<std::vector<std::string>> list(std::size_t nic, zorvagent::PropertyNumber property) const;
+  std::optional<std::string> text(std::size_t nic, zorva::agent::PropertyNumber property) const;
+  std::optional<std::vector<std::string>> list(std::size_t nic, zorva::agent::PropertyNumber property) const;
 
   const std::string& dataDir() const { return dataDir_; }  // ends in a slash
   std::string filePath(const std::string& nic) const { return dataDir_ + "ifcfg-" + nic; }
@@ -98,7 +98,7 @@ class World {
   };
 
   void useConfig() const;
-  const zorvagent::Node* nodeOf(const zorvagent::TreeSnapshot& snapshot, std::size_t nic) const;
+  const zorva::agent::Node* nodeOf(const zorva::agent::TreeSnapshot& snapshot, std::size_t nic) const;
 
   std::string systemName_ = "host1";
   std::vector<System> systems_;
@@ -112,7 +112,7 @@ enum class Thrown { StdException, Int };
 
 // Makes one call of the tree's cursors fail, the n-th from now on, counted from 1, or counts them where n is 0. One at
 // a time.
-class FailingTree : private zorvagent::TreeCallHook {
+class FailingTree : private zorva::agent::TreeCallHook {
  public:
   explicit FailingTree(std::size_t n = 0, Thrown thrown = Thrown::StdException);
   ~FailingTree() override;
@@ -120,16 +120,16 @@ class FailingTree : private zorvagent::TreeCallHook {
   FailingTree& operator=(const FailingTree&) = delete;
 
   std::size_t callCount() const { return calls().size(); }
-  std::vector<zorvagent::TreeCall> calls() const;
+  std::vector<zorva::agent::TreeCall> calls() const;
   bool hasThrown() const { return n_ != 0 && callCount() >= n_; }
 
  private:
-  void before(zorvagent::TreeCall call) override;
+  void before(zorva::agent::TreeCall call) override;
 
   std::size_t n_;
   Thrown thrown_;
   mutable std::mutex mutex_;
-  std::vector<zorvagent::TreeCall> calls_;
+  std::vector<zorva::agent::TreeCall> calls_;
 };
 
 // Runs the operation with the tree failing at its 1st call, its 2nd, and so on, in both ways, until the operation makes

@@ -133,8 +133,8 @@ TEST(FailingTree, ThrowsAtTheCallThatWasAsked) {
   EXPECT_THROW(cursor.selectNode(NodeLexicon::NODE_NETWORK_IP_CONFIG), std::runtime_error);
   EXPECT_TRUE(failing.hasThrown());
   cursor.selectNode(NodeLexicon::NODE_NETWORK_IP_CONFIG);
-  EXPECT_THAT(failing.calls(), ElementsAre(zorvagent::TreeCall::Construct, zorvagent::TreeCall::SelectByType,
-                                           zorvagent::TreeCall::SelectByType));
+  EXPECT_THAT(failing.calls(), ElementsAre(zorva::agent::TreeCall::Construct, zorva::agent::TreeCall::SelectByType,
+                                           zorva::agent::TreeCall::SelectByType));
 }
 
 TEST(FailingTree, EachCallFailsInBothWays) {

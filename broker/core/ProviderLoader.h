@@ -1,0 +1,79 @@
+#pragma once
+
+#include <atomic>
+#include <memory>
+#include <mutex>
+#include <string>
+#include <unordered_map>
+#include <vector>
+
+#include "broker/core/ProviderRegistry.h"
+#include "broker/objects/Value.h"
+#include "cmpidt.h"
+#include "cmpift.h"
+
+// Loads provider libraries when the first request needs them, and makes each provider's MIs once, all kinds of one
+// provider together: its create functions store the broker where its operations read it, without a lock, and so none
+// may run once another's MI is in use. Safe on any thread.
+
+namespace zorva::broker {
+
+class BrokerCore;
+struct LinkedFunction;
+
+class ProviderLoader {
+ public:
+  ProviderLoader(BrokerCore& core, const ProviderRegistry& registry, std::string directory,
+                 std::vector<LinkedFunction> linked);
+
+  /// Calls the cleanup of every MI that was made, then closes the libraries, save those that ask to stay.
+  ~ProviderLoader();
+  ProviderLoader(const ProviderLoader&) = delete;
+  ProviderLoader& operator=(const ProviderLoader&) = delete;
+
+  /// The MI of an entry of the registry; null with a failure that says what is missing. A failure is not remembered:
+  /// the next request tries again.
+  const CMPIInstanceMI* instanceMi(const ProviderEntry& entry, Status& status);
+  const CMPIAssociationMI* associationMi(const ProviderEntry& entry, Status& status);
+  const CMPIMethodMI* methodMi(const ProviderEntry& entry, Status& status);
+
+  /// Opens every library that the registry names, and says of each one that cannot be opened why.
+  std::vector<std::string> openAll();
+
+ private:
+  struct Library;
+  /// One prefix in one library; several entries of the registry may share it.
+  struct Provider {
+    std::string prefix;
+    std::string library;
+    std::string nameSpace;
+    unsigned kinds = 0;
+    bool isBeingMade = false;  // guarded by mutex_
+    std::atomic<const CMPIInstanceMI*> instance = nullptr;
+    std::atomic<const CMPIAssociationMI*> association = nullptr;
+    std::atomic<const CMPIMethodMI*> method = nullptr;
+  };
+
+  Provider& providerOf(const ProviderEntry& entry) const;
+  Library* open(const std::string& name, Status& status);
+  /// A create function, in the program itself for a provider without library. Null with a failure.
+  void* findFunction(const Provider& provider, const std::string& function, Status& status);
+  /// Makes what the provider lacks of its kinds and publishes it. `status` is that of the kind `wanted`.
+  void makeAll(Provider& provider, MiKind wanted, Status& status);
+  template <class Mi>
+  const Mi* make(const Provider& provider, const char* kind, Status& status);
+  template <class Mi>
+  const Mi* find(const ProviderEntry& entry, std::atomic<const Mi*> Provider::*slot, MiKind kind, Status& status);
+  template <class Mi>
+  bool cleanUp(Provider& provider, std::atomic<const Mi*> Provider::*slot) noexcept;
+
+  BrokerCore& core_;
+  const std::string directory_;
+  const std::vector<LinkedFunction> linked_;
+  std::vector<std::unique_ptr<Provider>> providers_;
+  // A create function may call up into the broker, which may need another provider.
+  std::recursive_mutex mutex_;
+  std::unordered_map<std::string, std::unique_ptr<Library>> libraries_;
+};
+
+}  // namespace zorva::broker

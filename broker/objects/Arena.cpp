@@ -1,0 +1,78 @@
+#include "broker/objects/Arena.h"
+
+#include <cstdlib>
+#include <cstring>
+
+#include "broker/objects/BlockCache.h"
+#include "broker/objects/ClassTable.h"
+#include "broker/objects/Objects.h"
+
+namespace zorva::broker {
+
+Arena::~Arena() {
+  while (blocks_ != nullptr) {
+    MemoryBlock* block = blocks_;
+    blocks_ = block->previous;
+    if (cache_ == nullptr || !cache_->keep(block)) std::free(block);
+  }
+}
+
+char* Arena::addBlock(std::size_t size) {
+  MemoryBlock* block = cache_ != nullptr && size == BlockCache::kBlock ? cache_->take() : nullptr;
+  if (block == nullptr) {
+    block = static_cast<MemoryBlock*>(std::malloc(sizeof(MemoryBlock) + size));
+    if (block == nullptr) throw std::bad_alloc();
+    block->size = size;
+  }
+  block->previous = blocks_;
+  blocks_ = block;
+  size_ += sizeof(MemoryBlock) + size;
+  return reinterpret_cast<char*>(block + 1);
+}
+
+void* Arena::takeFromNewBlock(std::size_t size) {
+  if (size > kMost) throw std::bad_alloc();
+  // What is large gets a block of its own, so that the room left in the present one is not lost.
+  if (size > next_ / 2) return addBlock(size);
+  position_ = addBlock(next_);
+  end_ = position_ + next_;
+  // Small requests stay small; from then on blocks are of the size that the cache keeps.
+  next_ = next_ * 4 < BlockCache::kBlock ? next_ * 4 : BlockCache::kBlock;
+  return take(size);
+}
+
+void* Arena::allocateShared(std::size_t size) {
+  const std::lock_guard lock(mutex_);
+  return take(size);
+}
+
+const char* Arena::text(std::string_view text) {
+  auto* copy = static_cast<char*>(allocate(text.size() + 1));
+  if (!text.empty()) std::memcpy(copy, text.data(), text.size());
+  copy[text.size()] = '\0';
+  return copy;
+}
+
+const ClassInfo* Arena::findClass(std::string_view name) {
+  if (classes_ == nullptr) return nullptr;
+  if (shared_) return classes_->find(name);
+  for (const ClassInfo* known : recentClasses_) {
+    if (known != nullptr && schema::sameName(known->name(), name)) return known;
+  }
+  const ClassInfo* found = classes_->find(name);
+  if (found != nullptr) recentClasses_[nextClass_++ % kRemembered] = found;
+  return found;
+}
+
+StringObject* Arena::intern(std::string_view text) {
+  if (text.empty()) return &emptyString();
+  if (shared_) return StringObject::make(*this, text);
+  for (StringObject* known : recentTexts_) {
+    if (known != nullptr && known->view() == text) return known;
+  }
+  StringObject* made = StringObject::make(*this, text);
+  recentTexts_[nextText_++ % kRemembered] = made;
+  return made;
+}
+
+}  // namespace zorva::broker

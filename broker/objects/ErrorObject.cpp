@@ -1,0 +1,124 @@
+#include "broker/objects/Data.h"
+#include "broker/objects/Objects.h"
+#include "broker/objects/TableSupport.h"
+
+namespace zorva::broker {
+
+namespace {
+
+StringObject* copySet(Arena& arena, const StringObject* text) {
+  return text != nullptr ? copyString(arena, *text) : nullptr;
+}
+
+ErrorObject* copyError(Arena& arena, const ErrorObject& error) {
+  auto* copy = arena.make<ErrorObject>(arena);
+  copy->codes = error.codes;
+  for (StringObject* ErrorObject::*text : {&ErrorObject::otherType, &ErrorObject::owningEntity, &ErrorObject::messageId,
+                                           &ErrorObject::message, &ErrorObject::causeDescription, &ErrorObject::source,
+                                           &ErrorObject::otherSourceFormat, &ErrorObject::statusDescription}) {
+    copy->*text = copySet(arena, error.*text);
+  }
+  if (error.actions != nullptr) copy->actions = copyArray(arena, *error.actions);
+  if (error.arguments != nullptr) copy->arguments = copyArray(arena, *error.arguments);
+  return copy;
+}
+
+// The getters and setters differ in the member alone.
+
+template <auto member>
+auto getCode(const CMPIError* handle, CMPIStatus* status) {
+  using Code = std::remove_reference_t<decltype(std::declval<ErrorObject::Codes&>().*member)>;
+  const ErrorObject* self = own<ErrorObject>(handle);
+  if (self == nullptr) return badHandle<Code>(status);
+  setStatus(status, CMPI_RC_OK);
+  return self->codes.*member;
+}
+
+template <StringObject* ErrorObject::*member>
+CMPIString* getText(const CMPIError* handle, CMPIStatus* status) {
+  const ErrorObject* self = own<ErrorObject>(handle);
+  if (self == nullptr) return badHandle<CMPIString*>(status);
+  setStatus(status, CMPI_RC_OK);
+  return self->*member;
+}
+
+template <ArrayObject* ErrorObject::*member>
+CMPIArray* getArray(const CMPIError* handle, CMPIStatus* status) {
+  const ErrorObject* self = own<ErrorObject>(handle);
+  if (self == nullptr) return badHandle<CMPIArray*>(status);
+  setStatus(status, CMPI_RC_OK);
+  return self->*member;
+}
+
+template <StringObject* ErrorObject::*member>
+CMPIStatus setText(CMPIError* handle, const char* text) {
+  ErrorObject* self = own<ErrorObject>(handle);
+  if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+  self->*member = text != nullptr ? StringObject::make(*self->arena, text) : nullptr;
+  return {CMPI_RC_OK, nullptr};
+}
+
+CMPIStatus setTextArray(CMPIError* handle, ArrayObject* ErrorObject::*member, const CMPIArray* given) {
+  ErrorObject* self = own<ErrorObject>(handle);
+  ArrayObject* array = self != nullptr ? adoptArray(*self->arena, given) : nullptr;
+  if (array == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+  if (array->type != CMPI_string) return statusOf(CMPI_RC_ERR_TYPE_MISMATCH, "not an array of texts");
+  self->*member = array;
+  return {CMPI_RC_OK, nullptr};
+}
+
+CMPIStatus setErrorType(CMPIError* handle, const CMPIErrorType type) {
+  ErrorObject* self = own<ErrorObject>(handle);
+  if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+  self->codes.type = type;
+  return {CMPI_RC_OK, nullptr};
+}
+
+CMPIStatus setErrorSourceFormat(CMPIError* handle, const CMPIErrorSrcFormat format) {
+  ErrorObject* self = own<ErrorObject>(handle);
+  if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+  self->codes.sourceFormat = format;
+  return {CMPI_RC_OK, nullptr};
+}
+
+CMPIStatus setRecommendedActions(CMPIError* handle, const CMPIArray* actions) {
+  return setTextArray(handle, &ErrorObject::actions, actions);
+}
+
+CMPIStatus setMessageArguments(CMPIError* handle, CMPIArray* arguments) {
+  return setTextArray(handle, &ErrorObject::arguments, arguments);
+}
+
+}  // namespace
+
+CMPIErrorFT ErrorObject::table = {
+    kTableVersion,
+    releaseObject<ErrorObject>,
+    guarded<cloneObject<ErrorObject, copyError>>,
+    guarded<getCode<&ErrorObject::Codes::type>>,
+    guarded<getText<&ErrorObject::otherType>>,
+    guarded<getText<&ErrorObject::owningEntity>>,
+    guarded<getText<&ErrorObject::messageId>>,
+    guarded<getText<&ErrorObject::message>>,
+    guarded<getCode<&ErrorObject::Codes::severity>>,
+    guarded<getCode<&ErrorObject::Codes::cause>>,
+    guarded<getText<&ErrorObject::causeDescription>>,
+    guarded<getArray<&ErrorObject::actions>>,
+    guarded<getText<&ErrorObject::source>>,
+    guarded<getCode<&ErrorObject::Codes::sourceFormat>>,
+    guarded<getText<&ErrorObject::otherSourceFormat>>,
+    guarded<getCode<&ErrorObject::Codes::status>>,
+    guarded<getText<&ErrorObject::statusDescription>>,
+    guarded<getArray<&ErrorObject::arguments>>,
+    guarded<setErrorType>,
+    guarded<setText<&ErrorObject::otherType>>,
+    guarded<setText<&ErrorObject::causeDescription>>,
+    guarded<setRecommendedActions>,
+    guarded<setText<&ErrorObject::source>>,
+    guarded<setErrorSourceFormat>,
+    guarded<setText<&ErrorObject::otherSourceFormat>>,
+    guarded<setText<&ErrorObject::statusDescription>>,
+    guarded<setMessageArguments>,
+};
+
+}  // namespace zorva::broker

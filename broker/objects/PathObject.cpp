@@ -1,0 +1,213 @@
+#include "broker/objects/ClassTable.h"
+#include "broker/objects/Data.h"
+#include "broker/objects/ObjectText.h"
+#include "broker/objects/Objects.h"
+#include "broker/objects/Qualifiers.h"
+#include "broker/objects/Scope.h"
+#include "broker/objects/TableSupport.h"
+
+namespace zorva::broker {
+
+namespace {
+
+CMPIStatus setNamespaceText(CMPIObjectPath* handle, const char* name) {
+  PathObject* self = own<PathObject>(handle);
+  if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+  self->setNameSpace(name != nullptr ? name : "");
+  return {CMPI_RC_OK, nullptr};
+}
+
+CMPIString* getNameSpace(const CMPIObjectPath* handle, CMPIStatus* status) {
+  const PathObject* self = own<PathObject>(handle);
+  if (self == nullptr) return badHandle<CMPIString*>(status);
+  setStatus(status, CMPI_RC_OK);
+  return self->nameSpace;
+}
+
+CMPIStatus setHostname(CMPIObjectPath* handle, const char* name) {
+  PathObject* self = own<PathObject>(handle);
+  if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+  self->setHost(name != nullptr ? name : "");
+  return {CMPI_RC_OK, nullptr};
+}
+
+CMPIString* getHostname(const CMPIObjectPath* handle, CMPIStatus* status) {
+  const PathObject* self = own<PathObject>(handle);
+  if (self == nullptr) return badHandle<CMPIString*>(status);
+  setStatus(status, CMPI_RC_OK);
+  return self->host;
+}
+
+CMPIStatus setClassName(CMPIObjectPath* handle, const char* name) {
+  PathObject* self = own<PathObject>(handle);
+  if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+  self->setClass(name != nullptr ? name : "");
+  return {CMPI_RC_OK, nullptr};
+}
+
+CMPIString* getClassName(const CMPIObjectPath* handle, CMPIStatus* status) {
+  const PathObject* self = own<PathObject>(handle);
+  if (self == nullptr) return badHandle<CMPIString*>(status);
+  setStatus(status, CMPI_RC_OK);
+  return self->className;
+}
+
+CMPIStatus addKey(CMPIObjectPath* handle, const char* name, const CMPIValue* value, CMPIType type) {
+  PathObject* self = own<PathObject>(handle);
+  if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+  if (name == nullptr || *name == '\0') return statusOf(CMPI_RC_ERR_INVALID_PARAMETER, "a key without a name");
+  CMPIData data;
+  const CMPIrc rc = importData(*self->arena, value, type, data);
+  if (rc != CMPI_RC_OK) return {rc, nullptr};
+  // A key that the class lacks is kept: what it is good for is for those to judge who are given the path.
+  const PropertyInfo* known = self->info != nullptr ? self->info->findKey(self->keys.size(), name) : nullptr;
+  if (known != nullptr && fitData(*known, data) != CMPI_RC_OK) {
+    return statusOf(CMPI_RC_ERR_TYPE_MISMATCH, std::string(name) + " is declared with another type");
+  }
+  self->keys.set(*self->arena, known != nullptr ? known->name : self->arena->intern(name), data);
+  return {CMPI_RC_OK, nullptr};
+}
+
+CMPIData asKey(CMPIData data) noexcept {
+  data.state = static_cast<CMPIValueState>(data.state | CMPI_keyValue);
+  return data;
+}
+
+CMPIData getKey(const CMPIObjectPath* handle, const char* name, CMPIStatus* status) {
+  const PathObject* self = own<PathObject>(handle);
+  if (self == nullptr) return badHandle<CMPIData>(status);
+  const EntryList::Entry* key = name != nullptr ? self->keys.find(name) : nullptr;
+  if (key == nullptr) {
+    setStatus(status, CMPI_RC_ERR_NOT_FOUND);
+    return nullData(CMPI_null, CMPI_notFound | CMPI_nullValue);
+  }
+  setStatus(status, CMPI_RC_OK);
+  return asKey(key->data);
+}
+
+CMPIData getKeyAt(const CMPIObjectPath* handle, CMPICount index, CMPIString** name, CMPIStatus* status) {
+  if (name != nullptr) *name = nullptr;
+  const PathObject* self = own<PathObject>(handle);
+  if (self == nullptr) return badHandle<CMPIData>(status);
+  if (index >= self->keys.size()) {
+    setStatus(status, CMPI_RC_ERR_NOT_FOUND);
+    return nullData(CMPI_null, CMPI_notFound | CMPI_nullValue);
+  }
+  if (name != nullptr) *name = self->keys[index].name;
+  setStatus(status, CMPI_RC_OK);
+  return asKey(self->keys[index].data);
+}
+
+CMPICount getKeyCount(const CMPIObjectPath* handle, CMPIStatus* status) {
+  const PathObject* self = own<PathObject>(handle);
+  if (self == nullptr) return badHandle<CMPICount>(status);
+  setStatus(status, CMPI_RC_OK);
+  return self->keys.size();
+}
+
+CMPIStatus setNameSpaceFromObjectPath(CMPIObjectPath* handle, const CMPIObjectPath* source) {
+  PathObject* self = own<PathObject>(handle);
+  const PathObject* from = self != nullptr ? readPath(*self->arena, source) : nullptr;
+  if (from == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+  self->nameSpace = copyString(*self->arena, *from->nameSpace);
+  return {CMPI_RC_OK, nullptr};
+}
+
+CMPIStatus setHostAndNameSpaceFromObjectPath(CMPIObjectPath* handle, const CMPIObjectPath* source) {
+  PathObject* self = own<PathObject>(handle);
+  const PathObject* from = self != nullptr ? readPath(*self->arena, source) : nullptr;
+  if (from == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+  self->nameSpace = copyString(*self->arena, *from->nameSpace);
+  self->host = copyString(*self->arena, *from->host);
+  return {CMPI_RC_OK, nullptr};
+}
+
+CMPIData getClassQualifier(const CMPIObjectPath* handle, const char* qualifier, CMPIStatus* status) {
+  const PathObject* self = own<PathObject>(handle);
+  if (self == nullptr) return badHandle<CMPIData>(status);
+  return qualifierData(*self, classQualifiers(*self), qualifier, status);
+}
+
+CMPIData getPropertyQualifier(const CMPIObjectPath* handle, const char* property, const char* qualifier,
+                              CMPIStatus* status) {
+  const PathObject* self = own<PathObject>(handle);
+  if (self == nullptr) return badHandle<CMPIData>(status);
+  return qualifierData(*self, propertyQualifiers(*self, property), qualifier, status);
+}
+
+CMPIData getMethodQualifier(const CMPIObjectPath* handle, const char* method, const char* qualifier,
+                            CMPIStatus* status) {
+  const PathObject* self = own<PathObject>(handle);
+  if (self == nullptr) return badHandle<CMPIData>(status);
+  return qualifierData(*self, methodQualifiers(*self, method), qualifier, status);
+}
+
+CMPIData getParameterQualifier(const CMPIObjectPath* handle, const char* method, const char* parameter,
+                               const char* qualifier, CMPIStatus* status) {
+  const PathObject* self = own<PathObject>(handle);
+  if (self == nullptr) return badHandle<CMPIData>(status);
+  return qualifierData(*self, parameterQualifiers(*self, method, parameter), qualifier, status);
+}
+
+CMPIString* toString(const CMPIObjectPath* handle, CMPIStatus* status) {
+  const PathObject* self = own<PathObject>(handle);
+  if (self == nullptr) return badHandle<CMPIString*>(status);
+  setStatus(status, CMPI_RC_OK);
+  return StringObject::make(*currentArena(self->arena), objectText(*self));
+}
+
+}  // namespace
+
+CMPIObjectPathFT PathObject::table = {
+    kTableVersion,
+    releaseObject<PathObject>,
+    guarded<cloneObject<PathObject, copyPath>>,
+    guarded<setNamespaceText>,
+    guarded<getNameSpace>,
+    guarded<setHostname>,
+    guarded<getHostname>,
+    guarded<setClassName>,
+    guarded<getClassName>,
+    guarded<addKey>,
+    guarded<getKey>,
+    guarded<getKeyAt>,
+    guarded<getKeyCount>,
+    guarded<setNameSpaceFromObjectPath>,
+    guarded<setHostAndNameSpaceFromObjectPath>,
+    guarded<getClassQualifier>,
+    guarded<getPropertyQualifier>,
+    guarded<getMethodQualifier>,
+    guarded<getParameterQualifier>,
+    guarded<toString>,
+};
+
+PathObject* PathObject::make(Arena& arena, std::string_view nameSpace, std::string_view className) {
+  auto* path = arena.make<PathObject>(arena);
+  path->setNameSpace(nameSpace);
+  path->setClass(className);
+  return path;
+}
+
+void PathObject::setClass(std::string_view name) {
+  if (const ClassInfo* known = arena->findClass(name)) {
+    setClass(*known);
+  } else {
+    info = nullptr;
+    className = arena->intern(name);
+  }
+}
+
+void PathObject::setClass(const ClassInfo& known) noexcept {
+  info = &known;
+  className = known.nameObject();
+}
+
+void PathObject::setNameSpace(std::string_view name) {
+  if (nameSpace->view() != name) nameSpace = arena->intern(name);
+}
+
+void PathObject::setHost(std::string_view name) {
+  if (host->view() != name) host = arena->intern(name);
+}
+
+}  // namespace zorva::broker

@@ -1,0 +1,77 @@
+#pragma once
+
+#include <atomic>
+#include <cstddef>
+#include <memory>
+#include <string_view>
+#include <unordered_map>
+#include <vector>
+
+#include "broker/objects/Arena.h"
+#include "cmpidt.h"
+
+// What one request on one thread has: the arena in which its CMPI objects are made, and the memory that its providers
+// asked for. Scopes nest as requests do: an up-call opens one within its caller's. The innermost scope of a thread is
+// the one in which objects are made.
+
+namespace zorva::broker {
+
+class BlockCache;
+class ClassTable;
+
+class Scope {
+ public:
+  /// Opens a scope on this thread, for objects of these classes. It must be closed on the same thread, inner scopes
+  /// first. `blocks` gives the memory.
+  Scope(const ClassTable& classes, BlockCache& blocks);
+  ~Scope();
+  Scope(const Scope&) = delete;
+  Scope& operator=(const Scope&) = delete;
+
+  /// The innermost scope of this thread, or null.
+  static Scope* current() noexcept;
+
+  Scope* parent() const noexcept { return parent_; }
+  unsigned depth() const noexcept { return depth_; }
+
+  /// Whether this request, or one that it is a part of, holds a claim. Others may ask and set it on any thread.
+  bool isClaimed() const noexcept;
+  void setClaimed(bool isClaimed) noexcept { isClaimed_ = isClaimed; }
+
+  /// Where objects are made now: the arena of the latest mark, or the scope's own.
+  Arena& arena() noexcept { return marks_.empty() ? arena_ : *marks_.back(); }
+
+  /// Makes all arenas of the scope safe for the threads that a provider is about to attach.
+  void share() noexcept;
+
+  /// What is made from here on goes at release(mark), at the latest with the scope.
+  const void* mark();
+  /// False where `mark` is none of this scope. Later marks go with it.
+  bool release(const void* mark);
+
+  /// Memory that goes with the scope. Null for want of memory, as malloc.
+  void* allocate(std::size_t size);
+  /// Null, with the block unchanged, where `block` is not of this scope.
+  void* reallocate(void* block, std::size_t size);
+  /// Passes over what is not of this scope.
+  void free(void* block);
+
+ private:
+  struct FreeBlock {
+    void operator()(void* block) const noexcept;
+  };
+
+  const ClassTable& classes_;
+  BlockCache& cache_;
+  Scope* const parent_;
+  const unsigned depth_;
+  std::atomic<bool> isClaimed_ = false;
+  Arena arena_;
+  std::vector<std::unique_ptr<Arena>> marks_;
+  std::unordered_map<void*, std::unique_ptr<void, FreeBlock>> blocks_;
+};
+
+/// The arena of the innermost scope; `fallback` on a thread that has none.
+Arena* currentArena(Arena* fallback = nullptr) noexcept;
+
+}  // namespace zorva::broker

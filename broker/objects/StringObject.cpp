@@ -1,0 +1,57 @@
+#include <cstring>
+#include <new>
+
+#include "broker/objects/Data.h"
+#include "broker/objects/Objects.h"
+#include "broker/objects/Scope.h"
+#include "broker/objects/TableSupport.h"
+
+namespace zorva::broker {
+
+namespace {
+
+StringObject* copyOfString(Arena& arena, const StringObject& text) { return StringObject::make(arena, text.view()); }
+
+const char* getCharPtr(const CMPIString* handle, CMPIStatus* status) {
+  const StringObject* self = own<StringObject>(handle);
+  if (self == nullptr) return badHandle<const char*>(status);
+  setStatus(status, CMPI_RC_OK);
+  return self->chars;
+}
+
+}  // namespace
+
+CMPIStringFT StringObject::table = {
+    kTableVersion,
+    releaseObject<StringObject>,
+    guarded<cloneObject<StringObject, copyOfString>>,
+    guarded<getCharPtr>,
+};
+
+StringObject* StringObject::make(Arena& arena, std::string_view text) {
+  // Object and characters in one piece.
+  auto* memory = static_cast<char*>(arena.allocate(sizeof(StringObject) + text.size() + 1));
+  char* chars = memory + sizeof(StringObject);
+  if (!text.empty()) std::memcpy(chars, text.data(), text.size());
+  chars[text.size()] = '\0';
+  return new (memory) StringObject(&arena, std::string_view(chars, text.size()));
+}
+
+StringObject& emptyString() noexcept {
+  static StringObject empty(nullptr, "");
+  return empty;
+}
+
+CMPIStatus statusOf(CMPIrc rc, std::string_view message) noexcept {
+  CMPIStatus status{rc, nullptr};
+  Arena* arena = message.empty() ? nullptr : currentArena();
+  if (arena == nullptr) return status;
+  try {
+    status.msg = StringObject::make(*arena, message);
+  } catch (const std::bad_alloc&) {
+    // The code alone says enough.
+  }
+  return status;
+}
+
+}  // namespace zorva::broker

@@ -1,0 +1,32 @@
+#pragma once
+
+#include <memory>
+#include <utility>
+
+#include "broker/core/BrokerOptions.h"
+#include "broker/objects/Scope.h"
+
+namespace zorva::broker {
+
+/// A claim of a request, and the mark of it on the request's scope. The scope outlives it.
+class HeldClaim {
+ public:
+  HeldClaim(Scope& scope, std::unique_ptr<Claim> claim) : scope_(scope), claim_(std::move(claim)) {
+    scope_.setClaimed(true);
+  }
+  ~HeldClaim() { scope_.setClaimed(false); }
+  HeldClaim(const HeldClaim&) = delete;
+  HeldClaim& operator=(const HeldClaim&) = delete;
+
+  /// How the request ends that ended like this: a failure that its provider did not notice comes first.
+  Status finish(Status status) {
+    Status unnoticed = claim_->finish();
+    return unnoticed.ok() ? std::move(status) : std::move(unnoticed);
+  }
+
+ private:
+  Scope& scope_;
+  const std::unique_ptr<Claim> claim_;
+};
+
+}  // namespace zorva::broker

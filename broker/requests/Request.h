@@ -1,0 +1,89 @@
+#pragma once
+
+#include <memory>
+#include <string_view>
+#include <vector>
+
+#include "broker/core/BrokerCore.h"
+#include "broker/objects/Convert.h"
+#include "broker/objects/Objects.h"
+#include "broker/objects/Scope.h"
+#include "broker/requests/HeldClaim.h"
+#include "broker/requests/Result.h"
+#include "broker/requests/ResultFilter.h"
+
+// One request, of a client or of a provider that calls up: which providers are asked, what they are handed, and what of
+// their answers goes on. It opens a scope on its thread that ends with it.
+
+namespace zorva::broker {
+
+/// As AssociationFilter in Broker.h.
+struct FarEnd {
+  std::string_view associationClass;
+  std::string_view resultClass;
+  std::string_view role;
+  std::string_view resultRole;
+};
+
+/// Instances or names: the two forms of most read operations.
+enum class Form { Instances, Paths };
+
+class Request {
+ public:
+  explicit Request(BrokerCore& core);
+  Request(const Request&) = delete;
+  Request& operator=(const Request&) = delete;
+
+  Scope& scope() noexcept { return scope_; }
+  Arena& arena() noexcept { return scope_.arena(); }
+  /// What the providers are given; empty at first.
+  ContextObject& context() noexcept { return context_; }
+
+  /// Takes the claim that providers of a class need, unless this request has one already; `held` stays null where there
+  /// is none.
+  Status claim(Access access, std::string_view className, const ObjectPath* changed, std::unique_ptr<HeldClaim>& held);
+
+  // The operations. `path` lives in this request's arena or outlives it; its namespace may be in any spelling, and
+  // empty for the default. Statuses as Broker.h tells.
+  Status enumerate(const PathObject& path, Form form, const Shape& shape, Taker& taker);
+  Status get(const PathObject& path, const Shape& shape, Taker& taker);
+  Status create(const PathObject& path, const InstanceObject& instance, Taker& taker);
+  /// `changes`, where it is not null, gets what is changed.
+  Status modify(const PathObject& path, const InstanceObject& instance, const Shape& shape,
+                std::vector<Property>* changes = nullptr);
+  Status remove(const PathObject& path);
+  Status associated(const PathObject& path, Form form, const FarEnd& filter, const Shape& shape, Taker& taker);
+  Status referring(const PathObject& path, Form form, const FarEnd& filter, const Shape& shape, Taker& taker);
+  Status invoke(const PathObject& path, std::string_view method, const EntryList& input, CMPIData& value,
+                EntryList& output);
+
+  /// `path` with the class `info` and the namespace as the registry spells it; a failure where either is unknown.
+  Status resolve(const PathObject& path, PathObject*& resolved);
+
+ private:
+  struct Association;
+
+  Status tooDeep() const;
+  const ProviderEntry* entryOf(const PathObject& path, const ClassInfo& info, MiKind kind) const;
+  std::vector<const ClassInfo*> servedBelow(const PathObject& path, const ClassInfo& info) const;
+  Status findAssociations(const PathObject& path, const FarEnd& filter, bool farEndMatters,
+                          std::vector<Association>& found, const ClassInfo*& resultClass) const;
+  const char** providerList(const Shape& shape, const std::vector<const ClassInfo*>& classes);
+
+  /// Calls a slot of a provider's table, null where the provider lacks it. What it throws becomes a failure.
+  template <class Function, class... Args>
+  Status call(ResultObject& result, const ProviderEntry& entry, std::string_view operation, Function function,
+              Args... args);
+  template <class Ask>
+  Status askEach(const std::vector<Association>& associations, const ResultFilter& results, Ask&& ask);
+  Status enumerateOne(const PathObject& path, const ClassInfo& info, Form form, const Shape& shape,
+                      ResultFilter& filter, bool& unavailable);
+  Status findInstanceMi(const PathObject& path, std::string_view operation, PathObject*& resolved,
+                        const ProviderEntry*& entry, const CMPIInstanceMI*& mi);
+
+  BrokerCore& core_;
+  Scope scope_;
+  ContextObject& context_;
+};
+
+}  // namespace zorva::broker

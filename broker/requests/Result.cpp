@@ -1,0 +1,121 @@
+#include "broker/requests/Result.h"
+
+#include "broker/core/BrokerCore.h"
+#include "broker/objects/Data.h"
+#include "broker/objects/Scope.h"
+#include "broker/objects/TableSupport.h"
+
+namespace zorva::broker {
+
+namespace {
+
+CMPIResult* clone(const CMPIResult* handle, CMPIStatus* status) {
+  const bool good = own<ResultObject>(handle) != nullptr;
+  return failed<CMPIResult*>(status, good ? CMPI_RC_ERR_NOT_SUPPORTED : CMPI_RC_ERR_INVALID_HANDLE);
+}
+
+/// Runs `take` under the result's lock, unless the receiver has enough. What the receiver throws becomes the error of
+/// the operation, not the provider's affair.
+template <class Take>
+CMPIStatus give(ResultObject& self, Take take) {
+  const std::lock_guard lock(self.mutex);
+  self.claim.reset();
+  if (self.full) return {CMPI_RC_ERR_FAILED, nullptr};
+  try {
+    self.full = !take();
+    return {CMPI_RC_OK, nullptr};
+  } catch (const std::exception& problem) {
+    self.full = true;
+    self.errorCode = CMPI_RC_ERR_FAILED;
+    self.errorMessage = std::string("the results could not be taken: ") + problem.what();
+    return {CMPI_RC_ERR_FAILED, nullptr};
+  }
+}
+
+CMPIStatus returnInstance(const CMPIResult* handle, const CMPIInstance* instance) {
+  ResultObject* self = own<ResultObject>(handle);
+  if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+  if ((self->accepts & ResultObject::Instances) == 0) {
+    self->drop("an instance where the operation returns none");
+    return {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
+  }
+  Arena* arena = currentArena();
+  const InstanceObject* object = arena != nullptr ? readInstance(*arena, instance) : own<InstanceObject>(instance);
+  if (object == nullptr) {
+    self->drop(instance == nullptr ? "a null instance" : "an instance that cannot be read");
+    return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+  }
+  return give(*self, [&] { return self->receiver->takeInstance(*object); });
+}
+
+CMPIStatus returnObjectPath(const CMPIResult* handle, const CMPIObjectPath* path) {
+  ResultObject* self = own<ResultObject>(handle);
+  if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+  if ((self->accepts & ResultObject::Paths) == 0) {
+    self->drop("an object path where the operation returns none");
+    return {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
+  }
+  Arena* arena = currentArena();
+  const PathObject* object = arena != nullptr ? readPath(*arena, path) : own<PathObject>(path);
+  if (object == nullptr) {
+    self->drop(path == nullptr ? "a null object path" : "an object path that cannot be read");
+    return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+  }
+  return give(*self, [&] { return self->receiver->takePath(*object); });
+}
+
+CMPIStatus returnData(const CMPIResult* handle, const CMPIValue* value, const CMPIType type) {
+  ResultObject* self = own<ResultObject>(handle);
+  if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+  // Instances and paths may come this way too.
+  if (value != nullptr && type == CMPI_instance) return returnInstance(handle, value->inst);
+  if (value != nullptr && type == CMPI_ref && (self->accepts & ResultObject::Values) == 0) {
+    return returnObjectPath(handle, value->ref);
+  }
+  Arena* arena = currentArena();
+  if ((self->accepts & ResultObject::Values) == 0 || arena == nullptr) {
+    self->drop("a value where the operation returns none");
+    return {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
+  }
+  CMPIData data;
+  const CMPIrc rc = importData(*arena, value, type, data);
+  if (rc != CMPI_RC_OK) return {rc, nullptr};
+  return give(*self, [&] { return self->receiver->takeData(data); });
+}
+
+// An operation that ends well is complete with or without it.
+CMPIStatus returnDone(const CMPIResult* handle) {
+  return {own<ResultObject>(handle) != nullptr ? CMPI_RC_OK : CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+}
+
+CMPIStatus returnError(const CMPIResult* handle, const CMPIError* error) {
+  ResultObject* self = own<ResultObject>(handle);
+  const ErrorObject* mine = own<ErrorObject>(error);
+  if (self == nullptr || (mine == nullptr && !isForeign(error))) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
+  CMPIStatus status{CMPI_RC_OK, nullptr};
+  const CMPIrc code = mine != nullptr ? mine->codes.status : error->ft->getCIMStatusCode(error, &status);
+  const std::string_view message = textOf(mine != nullptr ? mine->message : error->ft->getMessage(error, &status));
+  const std::lock_guard lock(self->mutex);
+  if (self->errorCode == CMPI_RC_OK) {
+    self->errorCode = code == CMPI_RC_OK ? CMPI_RC_ERR_FAILED : code;
+    self->errorMessage = message;
+  }
+  return {CMPI_RC_OK, nullptr};
+}
+
+}  // namespace
+
+CMPIResultFT resultTable = {
+    kTableVersion,           releaseObject<ResultObject>, guarded<clone>,      guarded<returnData>,
+    guarded<returnInstance>, guarded<returnObjectPath>,   guarded<returnDone>, guarded<returnError>,
+};
+
+bool Receiver::takeInstance(const InstanceObject& /*instance*/) { return true; }
+bool Receiver::takePath(const PathObject& /*path*/) { return true; }
+bool Receiver::takeData(const CMPIData& /*data*/) { return true; }
+
+void ResultObject::drop(std::string_view what) const {
+  core.log(LogLevel::Warning, who + " returned " + std::string(what) + "; it was dropped");
+}
+
+}  // namespace zorva::broker

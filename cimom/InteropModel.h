@@ -1,0 +1,32 @@
+#pragma once
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "broker/objects/Value.h"
+
+// The instances of the interop namespaces, as plain values.
+
+namespace zorva::cimom {
+
+inline constexpr const char* kProfileClass = "CIM_RegisteredProfile";
+inline constexpr const char* kConformanceClass = "CIM_ElementConformsToProfile";
+
+/// What the instances tell of.
+struct InteropWorld {
+  std::string nameSpace;                ///< in which they are asked for
+  std::string profileNameSpace;         ///< in which the profile is registered
+  std::vector<std::string> nameSpaces;  ///< all that the server has
+  std::string hostName;
+  std::vector<broker::ObjectPath> systems;    ///< the computer systems
+  std::vector<broker::ObjectPath> endpoints;  ///< the DNS endpoints
+};
+
+/// All instances of one class, with their paths.
+std::vector<broker::Instance> interopInstances(const InteropWorld& world, std::string_view className);
+
+/// True for two names of one instance: hosts and namespaces are not compared, nor in references among the keys.
+bool sameInstance(const broker::ObjectPath& a, const broker::ObjectPath& b);
+
+}  // namespace zorva::cimom

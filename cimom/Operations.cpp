@@ -1,0 +1,225 @@
+#include "cimom/Operations.h"
+
+#include <algorithm>
+
+#include "broker/objects/PathText.h"
+#include "cimxml/ElementWriter.h"
+#include "cmpidt.h"
+#include "schema/Utf8.h"
+
+namespace zorva::cimom {
+
+namespace {
+
+using broker::Status;
+
+/// Operations that DSP0200 has and this server does not offer.
+constexpr std::pair<std::string_view, const char*> kNotOffered[] = {
+    {"CreateClass", "the classes are built in and cannot be changed"},
+    {"ModifyClass", "the classes are built in and cannot be changed"},
+    {"DeleteClass", "the classes are built in and cannot be changed"},
+    {"SetQualifier", "the qualifier types are built in and cannot be changed"},
+    {"DeleteQualifier", "the qualifier types are built in and cannot be changed"},
+    {"ExecQuery", "queries are not offered; enumerate the class and choose among its instances"},
+    {"OpenQueryInstances", "queries are not offered; use OpenEnumerateInstances"},
+    {"PullInstances", "queries are not offered, and so are their results; use PullInstancesWithPath"},
+};
+
+Status notOffered(const std::string& name) {
+  for (const auto& [known, why] : kNotOffered) {
+    if (schema::sameName(known, name)) return {CMPI_RC_ERR_NOT_SUPPORTED, std::string(known) + ": " + why};
+  }
+  return {CMPI_RC_ERR_NOT_SUPPORTED, "there is no operation " + broker::quotedText(name.substr(0, 80))};
+}
+
+OperationFunction findOperation(std::string_view name) noexcept {
+  for (const auto find : {findInstanceOperation, findAssociationOperation, findClassOperation, findPullOperation}) {
+    if (const OperationFunction found = find(name)) return found;
+  }
+  return nullptr;
+}
+
+/// A parameter that is there twice, in any case; empty where there is none.
+template <class Parameters>
+std::string_view twice(const Parameters& parameters) {
+  std::vector<std::string_view> names;
+  for (const auto& one : parameters) names.push_back(one.name);
+  std::stable_sort(names.begin(), names.end(), schema::NameLess());
+  const auto found = std::adjacent_find(names.begin(), names.end(), schema::NameEqual());
+  return found != names.end() ? *found : std::string_view();
+}
+
+Status checkParameterNames(const cimxml::Call& call) {
+  const std::string_view name = call.isExtrinsic ? twice(call.input) : twice(call.parameters);
+  if (name.empty()) return {};
+  return {CMPI_RC_ERR_INVALID_PARAMETER,
+          call.name + ": the parameter " + broker::quotedText(name.substr(0, 80)) + " is there twice"};
+}
+
+/// CMPI has codes that CIM lacks.
+Status asCim(Status status) {
+  constexpr int kLastOfCim = 29;
+  if (status.rc >= 0 && status.rc <= kLastOfCim) return status;
+  const std::string name(broker::statusName(status.rc));
+  return {CMPI_RC_ERR_FAILED, status.message.empty() ? name : status.message + " (" + name + ")"};
+}
+
+}  // namespace
+
+Status carryOut(Operation& operation) {
+  const cimxml::Call& call = operation.call;
+  const OperationFunction function = call.isExtrinsic ? invokeMethod : findOperation(call.name);
+  if (function == nullptr) return notOffered(call.name);
+  operation.nameSpace = operation.broker.registry().nameSpace(call.target.nameSpace);
+  if (operation.nameSpace.empty()) {
+    return {CMPI_RC_ERR_INVALID_NAMESPACE,
+            "there is no namespace " + broker::quotedText(call.target.nameSpace.substr(0, 200))};
+  }
+  Status status = checkParameterNames(call);
+  return asCim(status.ok() ? function(operation) : std::move(status));
+}
+
+void noteChange(const Operation& operation, std::string_view what, const broker::ObjectPath& path,
+                const std::vector<std::string>& names) {
+  constexpr std::size_t kLongestPath = 1000;
+  const std::string text = broker::pathText(path);
+  std::string line = std::string(what) + " " + text.substr(0, schema::utf8Cut(text, kLongestPath));
+  for (const std::string& name : names) line += (&name == names.data() ? ": " : ", ") + name;
+  operation.noteChange(line);
+}
+
+void settleValue(const Operation& operation, broker::Value& value) {
+  const auto settle = [&](broker::Scalar& scalar) {
+    if (auto* reference = std::get_if<broker::Boxed<broker::ObjectPath>>(&scalar)) {
+      broker::ObjectPath& path = **reference;
+      if (operation.host.isThis(path.host, operation.hostHeader)) path.host.clear();
+      for (broker::NamedValue& key : path.keys) settleValue(operation, key.value);
+    }
+  };
+  settle(value.scalar);
+  for (broker::Scalar& element : value.elements) settle(element);
+}
+
+namespace {
+
+/// Providers name the host of what they give as they name the computer system, which may be configured.
+bool isNameOfASystem(const Operation& operation, std::string_view host) {
+  bool found = false;
+  const broker::PathSink look = [&](const broker::ObjectPath& path) {
+    const broker::Value* name = path.key("Name");
+    found = found || (name != nullptr && schema::sameName(name->asText(), host));
+    return !found;
+  };
+  operation.broker.enumerateInstanceNames({}, "CIM_ComputerSystem", look, operation.caller);
+  return found;
+}
+
+/// Whether a name has all the keys that were given.
+bool hasKeys(const broker::ObjectPath& name, const broker::ObjectPath& given) {
+  return schema::sameName(name.className, given.className) &&
+         std::all_of(given.keys.begin(), given.keys.end(), [&name](const broker::NamedValue& key) {
+           const broker::Value* value = name.key(key.name);
+           return value != nullptr && *value == key.value;
+         });
+}
+
+/// Clients leave out keys that tell them nothing. Where one instance alone has those that they give, it is meant; else
+/// the provider decides.
+void completeKeys(const Operation& operation, broker::ObjectPath& path) {
+  const schema::Class* declared = operation.classes().find(path.className);
+  broker::ObjectPath given;
+  if (declared == nullptr || path.keys.empty() || path.keys.size() >= declared->keys().size() ||
+      !operation.broker.canonicalPath(path, given).ok()) {
+    return;
+  }
+  std::vector<broker::ObjectPath> found;
+  const broker::PathSink look = [&](const broker::ObjectPath& name) {
+    if (hasKeys(name, given)) found.push_back(name);
+    return found.size() < 2;
+  };
+  const Status status =
+      operation.broker.enumerateInstanceNames(operation.nameSpace, path.className, look, operation.caller);
+  if (status.ok() && found.size() == 1) path.keys = std::move(found.front().keys);
+}
+
+}  // namespace
+
+Status settlePath(const Operation& operation, broker::ObjectPath& path) {
+  if (!path.host.empty() && !operation.host.isThis(path.host, operation.hostHeader) &&
+      !isNameOfASystem(operation, path.host)) {
+    return {CMPI_RC_ERR_INVALID_PARAMETER,
+            "the path is of the host " + broker::quotedText(path.host.substr(0, 200)) + ", which is not this one"};
+  }
+  path.host.clear();
+  path.nameSpace = operation.nameSpace;
+  for (broker::NamedValue& key : path.keys) {
+    settleValue(operation, key.value);
+    if (!key.name.empty()) continue;
+    const schema::Class* declared = operation.classes().find(path.className);
+    if (declared == nullptr) continue;  // which the broker says
+    if (declared->keys().size() != 1) {
+      return {CMPI_RC_ERR_INVALID_PARAMETER,
+              declared->name() + " has " + std::to_string(declared->keys().size()) + " keys, so each needs its name"};
+    }
+    key.name = declared->keys().front()->name;
+  }
+  completeKeys(operation, path);
+  return {};
+}
+
+namespace {
+
+/// Values that come without a type take the declared one; a type that the client names has to be that one.
+Status checkSaidTypes(const Operation& operation) {
+  const cimxml::Call& call = operation.call;
+  const schema::Class* declared = operation.classes().find(call.target.className);
+  const schema::ClassMethod* method = declared != nullptr ? declared->findMethod(call.name) : nullptr;
+  if (method == nullptr) return {};  // which the broker says
+  for (std::size_t i = 0; i < call.input.size(); ++i) {
+    for (const schema::Parameter& parameter : method->parameters) {
+      if (!call.saidTypes[i] || *call.saidTypes[i] == parameter.type) continue;
+      if (!schema::sameName(parameter.name, call.input[i].name)) continue;
+      return {CMPI_RC_ERR_INVALID_PARAMETER, method->name + ": the parameter " + parameter.name + " is a " +
+                                                 std::string(schema::typeName(parameter.type)) + ", but comes as a " +
+                                                 std::string(schema::typeName(*call.saidTypes[i]))};
+    }
+  }
+  return {};
+}
+
+/// What a method does is not known here: one that ends well counts as a change, but for the one that is known to read.
+void noteCall(const Operation& operation, const broker::ObjectPath& path, const broker::MethodResult& result) {
+  const broker::Scalar& value = result.returnValue.scalar;
+  const bool isDone = result.returnValue.isNull || value == broker::Scalar(std::uint64_t{0}) ||
+                      value == broker::Scalar(std::int64_t{0});
+  const schema::Class* declared = operation.classes().find(path.className);
+  const schema::ClassMethod* method = declared != nullptr ? declared->findMethod(operation.call.name) : nullptr;
+  if (!isDone || method == nullptr || method->name == "GetCentralInstances") return;
+  std::vector<std::string> names;
+  for (const broker::NamedValue& argument : operation.call.input) names.push_back(argument.name);
+  noteChange(operation, "called " + method->name + " of", path, names);
+}
+
+}  // namespace
+
+Status invokeMethod(Operation& operation) {
+  broker::ObjectPath path = operation.call.target;
+  Status status = checkSaidTypes(operation);
+  if (status.ok()) status = settlePath(operation, path);
+  if (!status.ok()) return status;
+  std::vector<broker::NamedValue> input = operation.call.input;
+  for (broker::NamedValue& argument : input) settleValue(operation, argument.value);
+  broker::MethodResult result;
+  status = operation.broker.invokeMethod(path, operation.call.name, input, result, operation.caller);
+  if (!status.ok()) return status;
+  noteCall(operation, path, result);
+  std::string& out = operation.writer.out();
+  if (!result.returnValue.isNull) cimxml::appendReturnValue(out, result.returnValue);
+  for (const broker::NamedValue& value : result.output) {
+    cimxml::appendParameter(out, value);
+    operation.writer.settle();
+  }
+  return {};
+}
+
+}  // namespace zorva::cimom

@@ -1,0 +1,171 @@
+#include <algorithm>
+
+#include "cimom/Operations.h"
+#include "cimom/OperationsArguments.h"
+#include "cimom/OperationsSelection.h"
+#include "cimxml/ClassWriter.h"
+#include "cimxml/ElementWriter.h"
+#include "cmpidt.h"
+
+// DSP0200 5.3.2.14 Associators, .15 AssociatorNames, .16 References, .17 ReferenceNames; of instances by the broker, of
+// classes by what the schema says.
+
+namespace zorva::cimom {
+
+namespace {
+
+using broker::Status;
+using schema::Class;
+using schema::ClassProperty;
+using schema::sameName;
+
+/// The four operations in one: which objects, and what of them.
+struct Question {
+  bool ofReferences = false;
+  bool namesOnly = false;
+  bool isClass = false;
+  broker::ObjectPath object;
+  broker::AssociationFilter filter;
+  broker::Selection selection;
+};
+
+Status takeQuestion(Operation& operation, Question& question) {
+  Arguments arguments(operation.call);
+  question.object = arguments.requiredObject("ObjectName", question.isClass);
+  question.filter = takeFilter(arguments, question.ofReferences);
+  if (!question.namesOnly) question.selection = takeSelection(arguments, false);
+  Status status = arguments.status();
+  return status.ok() ? settlePath(operation, question.object) : status;
+}
+
+// Of classes.
+
+bool fits(const ClassProperty& end, const std::string& role) { return role.empty() || sameName(end.name, role); }
+
+/// Whether an object of either class may be one of the other.
+bool related(const Class& a, const Class& b) { return a.isA(b) || b.isA(a); }
+
+/// The classes that an association leads to from `source`, or the association itself.
+void collect(const Class& association, const Class& source, const Question& question, const Class* resultClass,
+             std::vector<const Class*>& found) {
+  const auto add = [&found](const Class& one) {
+    if (std::find(found.begin(), found.end(), &one) == found.end()) found.push_back(&one);
+  };
+  for (const ClassProperty* nearEnd : association.references()) {
+    if (!source.isA(*nearEnd->reference) || !fits(*nearEnd, question.filter.role)) continue;
+    if (question.ofReferences) add(association);
+    if (question.ofReferences) continue;
+    for (const ClassProperty* farEnd : association.references()) {
+      if (farEnd == nearEnd || !fits(*farEnd, question.filter.resultRole)) continue;
+      if (resultClass == nullptr || related(*farEnd->reference, *resultClass)) add(*farEnd->reference);
+    }
+  }
+}
+
+Status findClass(const Operation& operation, const std::string& name, std::string_view what, const Class*& found) {
+  if (name.empty()) return {};
+  found = operation.classes().find(name);
+  if (found != nullptr) return {};
+  return {CMPI_RC_ERR_INVALID_PARAMETER, std::string(what) + ": there is no class \"" + name + "\""};
+}
+
+Status answerOfClass(Operation& operation, const Question& question) {
+  const Class* source = nullptr;
+  const Class* association = nullptr;
+  const Class* resultClass = nullptr;
+  Status status = findClass(operation, question.object.className, "ObjectName", source);
+  if (status.ok()) {
+    status = findClass(operation, question.filter.associationClass,
+                       question.ofReferences ? "ResultClass" : "AssocClass", association);
+  }
+  if (status.ok()) status = findClass(operation, question.filter.resultClass, "ResultClass", resultClass);
+  if (!status.ok()) return status;
+  std::vector<const Class*> found;
+  for (const Class* candidate : operation.classes().classes()) {
+    if (!candidate->isAssociation() || (association != nullptr && !candidate->isA(*association))) continue;
+    collect(*candidate, *source, question, resultClass, found);
+  }
+  const cimxml::ClassDetail detail{false, question.selection.includeQualifiers, question.selection.includeClassOrigin,
+                                   question.selection.propertyList};
+  operation.writer.beginReturnValue();
+  for (const Class* one : found) {
+    std::string& out = operation.writer.out();
+    out += question.namesOnly ? "<OBJECTPATH>" : "<VALUE.OBJECTWITHPATH>";
+    cimxml::appendClassPath(out, operation.host.name(), operation.nameSpace, one->name());
+    if (!question.namesOnly) cimxml::appendClass(out, *one, detail, operation.classes());
+    out += question.namesOnly ? "</OBJECTPATH>" : "</VALUE.OBJECTWITHPATH>";
+    operation.writer.settle();
+  }
+  operation.writer.endReturnValue();
+  return {};
+}
+
+// Of instances.
+
+Status answerNames(Operation& operation, const Question& question) {
+  Stream stream(operation.writer);
+  const broker::PathSink write = [&](const broker::ObjectPath& path) {
+    return stream.put([&](std::string& out) {
+      out += "<OBJECTPATH>";
+      cimxml::appendWholePath(out, path, operation.host.name());
+      out += "</OBJECTPATH>";
+    });
+  };
+  operation.writer.beginReturnValue();
+  Status status = question.ofReferences
+                      ? operation.broker.referenceNames(question.object, question.filter, write, operation.caller)
+                      : operation.broker.associatorNames(question.object, question.filter, write, operation.caller);
+  stream.finish();
+  operation.writer.endReturnValue();
+  return status;
+}
+
+Status answerInstances(Operation& operation, const Question& question) {
+  Stream stream(operation.writer);
+  const cimxml::InstanceDetail detail = detailOf(operation, question.selection);
+  const broker::InstanceSink write = [&](const broker::Instance& instance) {
+    return stream.put([&](std::string& out) {
+      out += "<VALUE.OBJECTWITHPATH>";
+      cimxml::appendWholePath(out, instance.path, operation.host.name());
+      cimxml::appendInstance(out, instance, detail);
+      out += "</VALUE.OBJECTWITHPATH>";
+    });
+  };
+  operation.writer.beginReturnValue();
+  broker::Broker& broker = operation.broker;
+  Status status =
+      question.ofReferences
+          ? broker.references(question.object, question.filter, question.selection, write, operation.caller)
+          : broker.associators(question.object, question.filter, question.selection, write, operation.caller);
+  stream.finish();
+  operation.writer.endReturnValue();
+  return status;
+}
+
+template <bool ofReferences, bool namesOnly>
+Status answer(Operation& operation) {
+  Question question;
+  question.ofReferences = ofReferences;
+  question.namesOnly = namesOnly;
+  Status status = takeQuestion(operation, question);
+  if (!status.ok()) return status;
+  if (question.isClass) return answerOfClass(operation, question);
+  return namesOnly ? answerNames(operation, question) : answerInstances(operation, question);
+}
+
+}  // namespace
+
+OperationFunction findAssociationOperation(std::string_view name) noexcept {
+  constexpr std::pair<std::string_view, OperationFunction> kOperations[] = {
+      {"Associators", answer<false, false>},
+      {"AssociatorNames", answer<false, true>},
+      {"References", answer<true, false>},
+      {"ReferenceNames", answer<true, true>},
+  };
+  for (const auto& [known, function] : kOperations) {
+    if (sameName(known, name)) return function;
+  }
+  return nullptr;
+}
+
+}  // namespace zorva::cimom

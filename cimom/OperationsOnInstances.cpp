@@ -1,0 +1,196 @@
+#include "cimom/Operations.h"
+#include "cimom/OperationsArguments.h"
+#include "cimom/OperationsSelection.h"
+#include "cimxml/ElementWriter.h"
+#include "cmpidt.h"
+#include "frontend/ReadBack.h"
+
+// DSP0200 5.3.2.2 GetInstance, .4 DeleteInstance, .6 CreateInstance, .8 ModifyInstance, .11 EnumerateInstances,
+// .12 EnumerateInstanceNames, .18 GetProperty, .19 SetProperty.
+
+namespace zorva::cimom {
+
+namespace {
+
+using broker::Instance;
+using broker::ObjectPath;
+using broker::Status;
+
+Status getInstance(Operation& operation) {
+  Arguments arguments(operation.call);
+  ObjectPath path = arguments.requiredPath("InstanceName");
+  const broker::Selection selection = takeSelection(arguments, true);
+  Status status = arguments.status();
+  if (status.ok()) status = settlePath(operation, path);
+  Instance instance;
+  if (status.ok()) status = operation.broker.getInstance(path, selection, instance, operation.caller);
+  if (!status.ok()) return status;
+  operation.writer.beginReturnValue();
+  cimxml::appendInstance(operation.writer.out(), instance, detailOf(operation, selection));
+  operation.writer.endReturnValue();
+  return {};
+}
+
+Status enumerateInstances(Operation& operation) {
+  Arguments arguments(operation.call);
+  const std::string className = arguments.requiredClassName("ClassName");
+  broker::Selection selection = takeSelection(arguments, true);
+  selection.deepInheritance = arguments.boolean("DeepInheritance", true);
+  Status status = arguments.status();
+  if (!status.ok()) return status;
+  const cimxml::InstanceDetail detail = detailOf(operation, selection);
+  Stream stream(operation.writer);
+  operation.writer.beginReturnValue();
+  const auto write = [&](const Instance& instance) {
+    return stream.put([&](std::string& out) {
+      out += "<VALUE.NAMEDINSTANCE>";
+      cimxml::appendInstanceName(out, instance.path);
+      cimxml::appendInstance(out, instance, detail);
+      out += "</VALUE.NAMEDINSTANCE>";
+    });
+  };
+  status = operation.broker.enumerateInstances(operation.nameSpace, className, selection, write, operation.caller);
+  stream.finish();
+  operation.writer.endReturnValue();
+  return status;
+}
+
+Status enumerateInstanceNames(Operation& operation) {
+  Arguments arguments(operation.call);
+  const std::string className = arguments.requiredClassName("ClassName");
+  Status status = arguments.status();
+  if (!status.ok()) return status;
+  Stream stream(operation.writer);
+  operation.writer.beginReturnValue();
+  const auto write = [&](const ObjectPath& path) {
+    return stream.put([&](std::string& out) { cimxml::appendInstanceName(out, path); });
+  };
+  status = operation.broker.enumerateInstanceNames(operation.nameSpace, className, write, operation.caller);
+  stream.finish();
+  operation.writer.endReturnValue();
+  return status;
+}
+
+void settleProperties(const Operation& operation, Instance& instance) {
+  for (broker::Property& property : instance.properties) settleValue(operation, property.value);
+}
+
+Status createInstance(Operation& operation) {
+  Arguments arguments(operation.call);
+  Instance instance = arguments.requiredInstance("NewInstance");
+  Status status = arguments.status();
+  if (!status.ok()) return status;
+  instance.path.nameSpace = operation.nameSpace;
+  settleProperties(operation, instance);
+  ObjectPath created;
+  status = operation.broker.createInstance(instance, created, operation.caller);
+  if (!status.ok()) return status;
+  noteChange(operation, "created", created);
+  operation.writer.beginReturnValue();
+  cimxml::appendInstanceName(operation.writer.out(), created);
+  operation.writer.endReturnValue();
+  return {};
+}
+
+Status modifyAndNote(const Operation& operation, const Instance& instance,
+                     const std::optional<std::vector<std::string>>& propertyList) {
+  std::vector<broker::Property> changed;
+  Status status = frontend::modifyInstance(operation.broker, instance, propertyList, operation.caller, &changed);
+  if (!status.ok() || changed.empty()) return status;
+  std::vector<std::string> names;
+  for (const broker::Property& property : changed) names.push_back(property.name);
+  noteChange(operation, "changed", instance.path, names);
+  return status;
+}
+
+Status modifyInstance(Operation& operation) {
+  Arguments arguments(operation.call);
+  Instance instance = arguments.requiredInstance("ModifiedInstance");
+  arguments.boolean("IncludeQualifiers", true);  // qualifiers of instances cannot be changed
+  const std::optional<std::vector<std::string>> propertyList = arguments.names("PropertyList");
+  Status status = arguments.status();
+  if (status.ok()) status = settlePath(operation, instance.path);
+  if (!status.ok()) return status;
+  settleProperties(operation, instance);
+  return modifyAndNote(operation, instance, propertyList);
+}
+
+Status deleteInstance(Operation& operation) {
+  Arguments arguments(operation.call);
+  ObjectPath path = arguments.requiredPath("InstanceName");
+  Status status = arguments.status();
+  if (status.ok()) status = settlePath(operation, path);
+  if (status.ok()) status = operation.broker.deleteInstance(path, operation.caller);
+  if (status.ok()) noteChange(operation, "deleted", path);
+  return status;
+}
+
+/// The property that an operation names.
+Status findProperty(const Operation& operation, const ObjectPath& path, const std::string& name,
+                    const schema::ClassProperty*& property) {
+  const schema::Class* declared = operation.classes().find(path.className);
+  if (declared == nullptr) return {CMPI_RC_ERR_INVALID_CLASS, "there is no class \"" + path.className + "\""};
+  property = declared->findProperty(name);
+  if (property != nullptr) return {};
+  return {CMPI_RC_ERR_NO_SUCH_PROPERTY, declared->name() + " has no property \"" + name + "\""};
+}
+
+Status getProperty(Operation& operation) {
+  Arguments arguments(operation.call);
+  ObjectPath path = arguments.requiredPath("InstanceName");
+  const std::string name = arguments.requiredText("PropertyName");
+  Status status = arguments.status();
+  if (status.ok()) status = settlePath(operation, path);
+  const schema::ClassProperty* property = nullptr;
+  if (status.ok()) status = findProperty(operation, path, name, property);
+  if (!status.ok()) return status;
+  broker::Selection selection;
+  selection.propertyList = {property->name};
+  Instance instance;
+  status = operation.broker.getInstance(path, selection, instance, operation.caller);
+  if (!status.ok()) return status;
+  const broker::Value* value = instance.property(property->name);
+  if (value == nullptr || value->isNull) return {};  // null is no IRETURNVALUE at all
+  operation.writer.beginReturnValue();
+  cimxml::appendValue(operation.writer.out(), *value);
+  operation.writer.endReturnValue();
+  return {};
+}
+
+Status setProperty(Operation& operation) {
+  Arguments arguments(operation.call);
+  Instance instance;
+  instance.path = arguments.requiredPath("InstanceName");
+  const std::string name = arguments.requiredText("PropertyName");
+  broker::Value value = arguments.value("NewValue");
+  Status status = arguments.status();
+  if (status.ok()) status = settlePath(operation, instance.path);
+  const schema::ClassProperty* property = nullptr;
+  if (status.ok()) status = findProperty(operation, instance.path, name, property);
+  if (!status.ok()) return status;
+  settleValue(operation, value);
+  if (value.isNull) value = broker::Value::null(property->type, property->isArray);
+  instance.properties.push_back({property->name, std::move(value), property});
+  return modifyAndNote(operation, instance, std::vector<std::string>{property->name});
+}
+
+}  // namespace
+
+OperationFunction findInstanceOperation(std::string_view name) noexcept {
+  constexpr std::pair<std::string_view, OperationFunction> kOperations[] = {
+      {"EnumerateInstances", enumerateInstances},
+      {"GetInstance", getInstance},
+      {"EnumerateInstanceNames", enumerateInstanceNames},
+      {"ModifyInstance", modifyInstance},
+      {"CreateInstance", createInstance},
+      {"DeleteInstance", deleteInstance},
+      {"GetProperty", getProperty},
+      {"SetProperty", setProperty},
+  };
+  for (const auto& [known, function] : kOperations) {
+    if (schema::sameName(known, name)) return function;
+  }
+  return nullptr;
+}
+
+}  // namespace zorva::cimom

@@ -1,0 +1,203 @@
+#include "cimom/ServiceHeaders.h"
+
+#include <algorithm>
+
+#include "broker/objects/PathText.h"
+#include "schema/Names.h"
+#include "schema/Schema.h"
+#include "schema/Utf8.h"
+
+namespace zorva::cimom {
+
+namespace {
+
+using schema::sameName;
+
+constexpr std::string_view kMapping = "http://www.dmtf.org/cim/mapping/http/v1.0";
+
+std::string_view trimmed(std::string_view text) noexcept {
+  const std::size_t begin = text.find_first_not_of(" \t");
+  if (begin == std::string_view::npos) return {};
+  return text.substr(begin, text.find_last_not_of(" \t") - begin + 1);
+}
+
+const std::string* find(const http::HttpRequest& request, std::string_view name) noexcept {
+  for (const auto& [known, value] : request.headers) {
+    if (sameName(known, name)) return &value;
+  }
+  return nullptr;
+}
+
+std::string textOf(const http::HttpRequest& request, std::string_view name) {
+  const std::string* value = find(request, name);
+  return value != nullptr ? std::string(trimmed(*value)) : std::string();
+}
+
+int hexDigit(char c) noexcept {
+  if (c >= '0' && c <= '9') return c - '0';
+  const char small = schema::lowerAscii(c);
+  return small >= 'a' && small <= 'f' ? small - 'a' + 10 : -1;
+}
+
+bool isUtf8(std::string_view text) noexcept {
+  while (!text.empty()) {
+    const std::size_t length = schema::utf8Length(text);
+    if (length == 0) return false;
+    text.remove_prefix(length);
+  }
+  return true;
+}
+
+/// "%3A" and the like undone; nothing where that cannot be, or the result is no UTF-8.
+std::optional<std::string> decoded(std::string_view text) {
+  std::string out;
+  for (std::size_t i = 0; i < text.size(); ++i) {
+    if (text[i] != '%') {
+      out += text[i];
+      continue;
+    }
+    const int high = i + 2 < text.size() ? hexDigit(text[i + 1]) : -1;
+    const int low = high >= 0 ? hexDigit(text[i + 2]) : -1;
+    if (low < 0) return std::nullopt;
+    out += static_cast<char>(static_cast<unsigned char>(high * 16 + low));
+    i += 2;
+  }
+  if (!isUtf8(out)) return std::nullopt;
+  return out;
+}
+
+HttpRefusal mismatch(std::string message) { return {400, "header-mismatch", std::move(message)}; }
+
+/// The number that `Man: http://www.dmtf.org/cim/mapping/http/v1.0 ; ns=73` declares; nothing where it declares none.
+std::optional<std::string> declaredPrefix(const http::HttpRequest& request) {
+  const std::string man = textOf(request, "Man");
+  const std::size_t mapping = man.find(kMapping);
+  if (mapping == std::string::npos) return std::nullopt;
+  std::string_view rest = std::string_view(man).substr(mapping + kMapping.size());
+  if (rest.starts_with('"')) rest.remove_prefix(1);
+  const std::size_t equals = rest.find("ns");
+  if (trimmed(rest.substr(0, equals)) != ";") return std::nullopt;
+  rest = trimmed(rest.substr(equals + 2));
+  if (!rest.starts_with('=')) return std::nullopt;
+  rest = trimmed(rest.substr(1));
+  const std::string_view digits = rest.substr(0, rest.find_first_not_of("0123456789"));
+  if (digits.empty() || digits.size() > 8) return std::nullopt;
+  return std::string(digits);
+}
+
+/// One of CIM's own fields: once at most, percent-encoded or not.
+std::optional<HttpRefusal> take(const http::HttpRequest& request, const CimHeaders& headers, std::string_view name,
+                                std::optional<std::string>& value) {
+  const std::string prefixed = headers.prefix.empty() ? std::string() : headers.prefix + "-" + std::string(name);
+  for (const auto& [known, text] : request.headers) {
+    if (!sameName(known, name) && (prefixed.empty() || !sameName(known, prefixed))) continue;
+    if (value) return mismatch("the header " + std::string(name) + " stands twice");
+    value = decoded(trimmed(text));
+    if (!value) return mismatch("the header " + std::string(name) + " is not UTF-8 in percent-encoding");
+  }
+  return std::nullopt;
+}
+
+std::optional<HttpRefusal> checkVersion(const std::optional<std::string>& version) {
+  if (!version || version->starts_with("1.")) return std::nullopt;
+  return HttpRefusal{501, "unsupported-protocol-version", "the header CIMProtocolVersion must be 1.x"};
+}
+
+/// Whether the key values that the header and the body tell are the same, as far as the schema can say.
+bool sameKeys(const broker::Broker& broker, const broker::ObjectPath& a, const broker::ObjectPath& b) {
+  broker::ObjectPath one;
+  broker::ObjectPath other;
+  // What is wrong with a path, the operation itself tells best.
+  if (!broker.canonicalPath(a, one).ok() || !broker.canonicalPath(b, other).ok()) return true;
+  if (one.keys.size() != other.keys.size()) return false;
+  for (std::size_t i = 0; i < one.keys.size(); ++i) {
+    if (one.keys[i].name != other.keys[i].name) return false;
+    const bool isReference = one.keys[i].value.type == schema::Type::Reference;
+    if (!isReference && one.keys[i].value != other.keys[i].value) return false;
+  }
+  return true;
+}
+
+std::optional<HttpRefusal> checkObject(const std::string& object, const cimxml::Call& call,
+                                       const broker::Broker& broker) {
+  if (!call.isExtrinsic) {
+    if (schema::sameNamespace(object, call.target.nameSpace)) return std::nullopt;
+    return mismatch("the header CIMObject is " + broker::quotedText(object.substr(0, 200)) +
+                    ", but the body has the namespace " + broker::quotedText(call.target.nameSpace.substr(0, 200)));
+  }
+  broker::ObjectPath path;
+  if (const auto error = broker::parsePathText(object, path)) {
+    return mismatch("the header CIMObject is no object path: at byte " + std::to_string(error->position) + ", " +
+                    error->message);
+  }
+  const bool isSame = schema::sameNamespace(path.nameSpace, call.target.nameSpace) &&
+                      sameName(path.className, call.target.className) &&
+                      (call.onClass || sameKeys(broker, path, call.target));
+  if (isSame) return std::nullopt;
+  return mismatch("the header CIMObject names another object than the body: " +
+                  broker::quotedText(object.substr(0, 200)));
+}
+
+}  // namespace
+
+std::optional<HttpRefusal> readHeaders(const http::HttpRequest& request, CimHeaders& headers) {
+  headers.isExtended = sameName(request.method, "M-POST");
+  std::optional<std::string> prefix = declaredPrefix(request);
+  if (headers.isExtended && !prefix) {
+    return HttpRefusal{510, "", "M-POST wants the header Man: " + std::string(kMapping) + " ; ns=NN"};
+  }
+  headers.prefix = std::move(prefix).value_or("");
+  headers.host = textOf(request, "Host");
+  headers.acceptLanguage = textOf(request, "Accept-Language");
+  headers.contentLanguage = textOf(request, "Content-Language");
+  std::optional<std::string> operation;
+  std::optional<std::string> batch;
+  std::optional<std::string> version;
+  auto refusal = take(request, headers, "CIMOperation", operation);
+  if (!refusal) refusal = take(request, headers, "CIMBatch", batch);
+  if (!refusal) refusal = take(request, headers, "CIMProtocolVersion", version);
+  if (!refusal) refusal = take(request, headers, "CIMMethod", headers.method);
+  if (!refusal) refusal = take(request, headers, "CIMObject", headers.object);
+  if (!refusal) refusal = checkVersion(version);
+  if (refusal) return refusal;
+  headers.isBatch = batch.has_value();
+  if (!operation && find(request, "CIMExport") != nullptr) {
+    return HttpRefusal{501, "unsupported-operation", "indications are not taken here"};
+  }
+  if (!operation)
+    return HttpRefusal{400, "header-mismatch", "the header CIMOperation is missing: this is no CIM request"};
+  if (sameName(*operation, "MethodCall")) return std::nullopt;
+  return HttpRefusal{400, "header-mismatch", "the header CIMOperation must be MethodCall"};
+}
+
+std::optional<HttpRefusal> checkHeaders(const CimHeaders& headers, const cimxml::CimRequest& request,
+                                        const broker::Broker& broker) {
+  if (request.isMultiple) {
+    if (!headers.method && !headers.object) return std::nullopt;
+    return mismatch("the headers CIMMethod and CIMObject go with a single request, but the body is a MULTIREQ");
+  }
+  if (headers.isBatch) return mismatch("the header CIMBatch goes with a MULTIREQ, but the body is a SIMPLEREQ");
+  const cimxml::Call& call = request.calls.front();
+  if (!headers.method) return mismatch("the header CIMMethod is missing");
+  if (!headers.object) return mismatch("the header CIMObject is missing");
+  if (!sameName(*headers.method, call.name)) {
+    return mismatch("the header CIMMethod is " + broker::quotedText(headers.method->substr(0, 200)) +
+                    ", but the body has " + broker::quotedText(call.name.substr(0, 200)));
+  }
+  return checkObject(*headers.object, call, broker);
+}
+
+http::HeaderList responseHeaders(const CimHeaders& headers) {
+  http::HeaderList fields{{"Content-Type", "application/xml; charset=\"utf-8\""}};
+  if (!headers.isExtended) {
+    fields.emplace_back("CIMOperation", "MethodResponse");
+    return fields;
+  }
+  fields.emplace_back("Ext", "");
+  fields.emplace_back("Cache-Control", "no-cache");
+  fields.emplace_back("Man", std::string(kMapping) + " ; ns=" + headers.prefix);
+  fields.emplace_back(headers.prefix + "-CIMOperation", "MethodResponse");
+  return fields;
+}
+
+}  // namespace zorva::cimom

@@ -1,0 +1,46 @@
+#pragma once
+
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "broker/Broker.h"
+#include "cimxml/RequestReader.h"
+#include "http/Exchange.h"
+
+// The header fields that CIM has over HTTP (DSP0200 1.4, 6.3 and 7): what they say, and whether it is what the body
+// says.
+
+namespace zorva::cimom {
+
+/// An answer at the level of HTTP.
+struct HttpRefusal {
+  int status = 400;
+  std::string cimError;  ///< the value of the header CIMError; may be empty
+  std::string message;   ///< for a person
+};
+
+/// The fields of one request, decoded.
+struct CimHeaders {
+  /// With M-POST, the number that stands before the names of the fields, and before those of the response ("73").
+  std::string prefix;
+  bool isExtended = false;  ///< the request came by M-POST
+  bool isBatch = false;
+  std::optional<std::string> method;
+  std::optional<std::string> object;
+  std::string host;  ///< the field Host
+  std::string acceptLanguage;
+  std::string contentLanguage;
+};
+
+/// Reads the fields. A refusal where the request is none of CIM's, or of another version.
+std::optional<HttpRefusal> readHeaders(const http::HttpRequest& request, CimHeaders& headers);
+
+/// Compares the fields with the body.
+std::optional<HttpRefusal> checkHeaders(const CimHeaders& headers, const cimxml::CimRequest& request,
+                                        const broker::Broker& broker);
+
+/// The fields of a response with a CIM message as its body.
+http::HeaderList responseHeaders(const CimHeaders& headers);
+
+}  // namespace zorva::cimom

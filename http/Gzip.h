@@ -1,0 +1,31 @@
+#pragma once
+
+#include <zlib.h>
+
+#include <string>
+#include <string_view>
+
+// A response that is compressed while it grows (RFC 1952).
+
+namespace zorva::http {
+
+class Gzip {
+ public:
+  /// Throws std::bad_alloc.
+  Gzip();
+  ~Gzip();
+  Gzip(const Gzip&) = delete;
+  Gzip& operator=(const Gzip&) = delete;
+
+  /// Appends to `out` what is ready of the text so far.
+  void add(std::string_view text, std::string& out) { run(text, out, Z_NO_FLUSH); }
+
+  /// Appends the rest. Nothing comes after.
+  void finish(std::string& out) { run({}, out, Z_FINISH); }
+
+ private:
+  void run(std::string_view text, std::string& out, int flush);
+  z_stream stream_{};
+};
+
+}  // namespace zorva::http

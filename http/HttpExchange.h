@@ -1,0 +1,162 @@
+#pragma once
+
+#include <microhttpd.h>
+#include <time.h>
+
+#include <atomic>
+#include <chrono>
+#include <condition_variable>
+#include <cstdint>
+#include <functional>
+#include <memory>
+#include <mutex>
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "http/Connections.h"
+#include "http/Exchange.h"
+#include "http/Gzip.h"
+#include "http/RequestHead.h"
+
+// One request and its response, between the event thread that owns the connection and the worker that answers.
+//
+// The connection is suspended while the worker computes. A response that ends below kWhole bytes goes out in one piece
+// with its length; a longer one is streamed in chunks: the worker fills `held_`, the event thread empties `outgoing_`
+// and exchanges the two. The worker waits while it is more than kMostHeld ahead, so no more than a few times that is
+// ever unsent.
+
+namespace zorva::http {
+
+/// Told by an exchange when its worker begins and ends to wait for the client.
+class WaitListener {
+ public:
+  virtual ~WaitListener() = default;
+  virtual void waitsForClient() = 0;
+  virtual void goesOn() = 0;
+};
+
+class HttpExchange final : public ResponseSink {
+ public:
+  using Clock = std::chrono::steady_clock;
+
+  static constexpr std::size_t kWhole = std::size_t{64} << 10;
+  static constexpr std::size_t kMostHeld = std::size_t{128} << 10;
+
+  HttpExchange(MHD_Connection* connection, std::shared_ptr<Connection> client, std::string path);
+
+  HttpRequest request;
+  std::optional<Refusal> refusal;  ///< answered in place of the work
+  bool headIsRead = false;
+  bool takesGzip = false;
+  bool isHttp11 = true;
+  const std::shared_ptr<Connection> client;
+
+  // ---- The event thread ----
+
+  /// Lets the connection rest until there is a response. Before the work may begin: then neither waits for the other.
+  void suspend();
+
+  /// Whether respond() may be called: there is a response, or its beginning.
+  bool isPublished() const;
+
+  /// Hands the response to the HTTP library.
+  MHD_Result respond();
+
+  /// The HTTP library is done with the request. The worker, where it still runs, gets ClientGone.
+  void ended();
+
+  int status() const noexcept { return status_; }
+  std::uint64_t bytesSent() const noexcept { return bytesSent_; }
+  Clock::time_point arrived() const noexcept { return arrived_; }
+
+  // ---- The worker ----
+
+  /// The work begins; `waits` lives longer than the work.
+  void start(WaitListener& waits);
+
+  void begin(int status, const HeaderList& headers) override;
+  void write(std::string_view text) override;
+  void fail(std::uint32_t cimStatus, std::string_view description) override;
+  bool begun() const override;
+  void setLateAnswer(LateAnswer answer) override;
+  bool isWanted() const override;
+
+  /// The work is done. Where it wrote nothing, `orElse` is the answer.
+  void finish(const Refusal& orElse);
+
+  // ---- Any thread ----
+
+  /// For how long the work has run, without the time in which it waited for the client; 0 where it has not begun.
+  Clock::duration worked() const;
+
+  /// For how long it has been waiting for the client now.
+  Clock::duration waiting() const;
+
+  /// True where the work has run for a while and its thread has used next to no processor time for it, or it has run
+  /// for long: it waits for something that is not its client.
+  bool hangs() const;
+
+  /// Gives the work up. Where nothing of a response was sent yet, the late answer that was set is the response, else
+  /// `orElse`. Later results are dropped. False: the work was done.
+  bool giveUp(const Refusal& orElse);
+
+  std::size_t place = 0;  ///< in the list of who owns it, under that one's lock
+
+ private:
+  void takeLateAnswer(const Refusal& orElse);
+  void append(std::string_view text);
+  void startStreaming();
+  void waitForClient(std::unique_lock<std::mutex>& lock);
+  void complete();
+  void publish();
+  void wake();
+  ssize_t fill(char* buffer, std::size_t most);
+  ssize_t endOfStream();
+  MHD_Response* makeResponse();
+  void addHeaders(MHD_Response& response) const;
+  static ssize_t fillResponse(void* exchange, std::uint64_t position, char* buffer, std::size_t most);
+
+  MHD_Connection* const connection_;
+  const Clock::time_point arrived_ = Clock::now();
+  MHD_Response* response_ = nullptr;  ///< the event thread's
+  std::string outgoing_;              ///< the event thread's, while it streams
+  std::size_t taken_ = 0;             ///< of outgoing_
+  std::uint64_t bytesSent_ = 0;
+
+  std::atomic<bool> published_ = false;  ///< set under the lock
+
+  mutable std::mutex mutex_;
+  std::condition_variable room_;
+  WaitListener* waits_ = nullptr;
+  int status_ = 0;
+  HeaderList headers_;
+  std::string held_;
+  std::unique_ptr<Gzip> gzip_;
+  bool begun_ = false;
+  bool streaming_ = false;
+  bool suspended_ = false;  ///< the connection awaits wake()
+  bool complete_ = false;   ///< nothing is added any more
+  bool gone_ = false;       ///< nobody takes the response
+  bool givenUp_ = false;
+  bool failed_ = false;
+  std::uint32_t cimStatus_ = 0;
+  std::string description_;
+  LateAnswer lateAnswer_;
+  std::optional<Clock::time_point> started_;  ///< moved on by the time spent waiting
+  std::optional<clockid_t> processorClock_;   ///< of the thread that does the work
+  Clock::duration processorAtStart_{};
+  std::optional<Clock::time_point> waitingSince_;
+};
+
+/// The response of a refusal: its reason as text, and the header fields that belong to it.
+HeaderList headersOf(const Refusal& refusal);
+std::string textOf(const Refusal& refusal);
+
+/// Adds a header field to a response. The HTTP library takes no empty value; a blank is one (RFC 9110 5.5).
+void addHeader(MHD_Response& response, const std::string& name, const std::string& value);
+
+/// Queues the response of a refusal for a connection, which is closed after it.
+MHD_Result respondWith(MHD_Connection* connection, const Refusal& refusal);
+
+}  // namespace zorva::http

@@ -1,0 +1,362 @@
+#include "http/HttpServer.h"
+
+#include <arpa/inet.h>
+#include <microhttpd.h>
+#include <netinet/in.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <atomic>
+#include <cstdarg>
+#include <cstdio>
+#include <cstring>
+#include <mutex>
+#include <optional>
+#include <stdexcept>
+#include <thread>
+#include <utility>
+
+#include "http/ClientIdentity.h"
+#include "http/Connections.h"
+#include "http/HttpExchange.h"
+#include "http/Log.h"
+#include "http/RequestHead.h"
+#include "http/Workers.h"
+
+namespace zorva::http {
+
+namespace {
+
+/// What the HTTP library keeps for a request.
+using Holder = std::shared_ptr<HttpExchange>;
+
+std::shared_ptr<Connection> connectionOf(MHD_Connection* connection) {
+  const MHD_ConnectionInfo* info = MHD_get_connection_info(connection, MHD_CONNECTION_INFO_SOCKET_CONTEXT);
+  return *static_cast<std::shared_ptr<Connection>*>(info->socket_context);
+}
+
+std::string withoutLineEnd(std::string text) {
+  while (!text.empty() && (text.back() == '\n' || text.back() == '\r')) text.pop_back();
+  return text;
+}
+
+}  // namespace
+
+class HttpServer::Core {
+ public:
+  Core(const HttpLimits& limits, int threads, Handler handler, std::string page);
+  ~Core();
+
+  void take(int socket, const sockaddr_storage& peer, socklen_t peerSize);
+  void setLimits(const HttpLimits& limits);
+  void sweep();
+  bool hasWork() const;
+  bool stop();
+
+  std::size_t connectionCount() const { return connections_.count(); }
+  std::size_t inFlight() const { return workers_.inFlight(); }
+  std::size_t requestsTaken() const { return requests_.load(std::memory_order_relaxed); }
+
+ private:
+  // What the HTTP library calls.
+  static MHD_Result onRequest(void* core, MHD_Connection* connection, const char* url, const char* method,
+                              const char* version, const char* data, std::size_t* size, void** holder);
+  static void* onRequestLine(void* core, const char* uri, MHD_Connection* connection);
+  static void onCompleted(void* core, MHD_Connection* connection, void** holder, MHD_RequestTerminationCode code);
+  static void onConnection(void* core, MHD_Connection* connection, void** context, MHD_ConnectionNotificationCode code);
+  static void onLog(void* core, const char* format, va_list arguments);
+
+  MHD_Result readHead(Holder& exchange, MHD_Connection* connection, const char* method, const char* version);
+  void readBody(HttpExchange& exchange, std::string_view data);
+  void releaseBody(HttpExchange& exchange);
+  bool answersAtOnce(HttpExchange& exchange) const;
+  MHD_Result requestIsWhole(const Holder& exchange);
+  void logRefusal(const HttpExchange& exchange, const Refusal& refusal) const;
+  void logAnswer(const HttpExchange& exchange) const;
+  void startDaemon(int threads);
+  HttpLimits limits() const;
+
+  mutable std::mutex limitsMutex_;
+  HttpLimits limits_;
+  const std::string page_;
+  Connections connections_;
+  Workers workers_;
+  std::atomic<std::size_t> bodies_ = 0;  ///< bytes of unfinished requests
+  std::atomic<std::size_t> requests_ = 0;
+  MHD_Daemon* daemon_ = nullptr;
+};
+
+HttpServer::Core::Core(const HttpLimits& limits, int threads, Handler handler, std::string page)
+    : limits_(limits),
+      page_(std::move(page)),
+      workers_(limits, [work = std::move(handler)](HttpExchange& exchange) { work(exchange.request, exchange); }) {
+  startDaemon(threads);
+}
+
+void HttpServer::Core::startDaemon(int threads) {
+  constexpr unsigned kFlags =
+      MHD_USE_EPOLL_INTERNAL_THREAD | MHD_USE_NO_LISTEN_SOCKET | MHD_ALLOW_SUSPEND_RESUME | MHD_USE_ERROR_LOG;
+  // take() counts the connections; those that are cut and not yet closed must not keep new ones out.
+  constexpr unsigned kMostConnections = 1U << 20;
+  // Strings are compared by the header's rules for each: strict where leniency would let requests be smuggled.
+  constexpr int kStrict = 1;
+  daemon_ = MHD_start_daemon(                                       //
+      kFlags, 0, nullptr, nullptr, &Core::onRequest, this,          //
+      MHD_OPTION_EXTERNAL_LOGGER, &Core::onLog, this,               //
+      MHD_OPTION_THREAD_POOL_SIZE, static_cast<unsigned>(threads),  //
+      MHD_OPTION_CONNECTION_LIMIT, kMostConnections,                //
+      MHD_OPTION_CONNECTION_MEMORY_LIMIT, limits_.headerBytes,      //
+      MHD_OPTION_STRICT_FOR_CLIENT, kStrict,                        //
+      MHD_OPTION_SIGPIPE_HANDLED_BY_APP, 1,                         //
+      MHD_OPTION_URI_LOG_CALLBACK, &Core::onRequestLine, this,      //
+      MHD_OPTION_NOTIFY_COMPLETED, &Core::onCompleted, this,        //
+      MHD_OPTION_NOTIFY_CONNECTION, &Core::onConnection, this, MHD_OPTION_END);
+  if (daemon_ == nullptr) throw std::runtime_error("the HTTP threads cannot be started");
+}
+
+HttpServer::Core::~Core() {
+  workers_.giveUpAll();
+  if (daemon_ != nullptr) MHD_stop_daemon(daemon_);
+}
+
+HttpLimits HttpServer::Core::limits() const {
+  const std::lock_guard lock(limitsMutex_);
+  return limits_;
+}
+
+void HttpServer::Core::setLimits(const HttpLimits& limits) {
+  const std::lock_guard lock(limitsMutex_);
+  limits_ = limits;
+  workers_.setLimits(limits);
+}
+
+void HttpServer::Core::take(int socket, const sockaddr_storage& peer, socklen_t peerSize) {
+  if (connections_.count() >= limits().connections && !connections_.cutIdlest()) {
+    ZORVA_LOG_CLIENT(Warning, addressText(peer) + ": refused, since all connections have a request in work");
+    ::close(socket);
+    return;
+  }
+  // From here on, since the library tells of it later, on a thread of its own.
+  connections_.add(socket, addressText(peer), clientOf(socket, peer));
+  if (MHD_add_connection(daemon_, socket, reinterpret_cast<const sockaddr*>(&peer), peerSize) != MHD_YES) {
+    ZORVA_LOG_CLIENT(Error, addressText(peer) + ": refused: " + std::strerror(errno));
+    // The library has closed the socket.
+    if (const auto refused = connections_.find(socket)) connections_.remove(*refused);
+  }
+}
+
+void HttpServer::Core::sweep() {
+  connections_.sweep(limits());
+  workers_.sweep();
+}
+
+bool HttpServer::Core::hasWork() const {
+  return workers_.inFlight() > 0 || connections_.countIn(Phase::Working) > 0 ||
+         connections_.countIn(Phase::Sending) > 0;
+}
+
+bool HttpServer::Core::stop() {
+  using Clock = std::chrono::steady_clock;
+  constexpr std::chrono::milliseconds kStep{5};
+  constexpr std::chrono::milliseconds kLastAnswers{500};
+  const auto waitUntil = [&](Clock::time_point deadline) {
+    while (hasWork() && Clock::now() < deadline) std::this_thread::sleep_for(kStep);
+  };
+  waitUntil(Clock::now() + limits().drain);
+  workers_.giveUpAll();
+  waitUntil(Clock::now() + kLastAnswers);
+  MHD_stop_daemon(std::exchange(daemon_, nullptr));
+  return workers_.join(kLastAnswers);
+}
+
+// ---- What the HTTP library calls ----
+
+void HttpServer::Core::onConnection(void* core, MHD_Connection* connection, void** context,
+                                    MHD_ConnectionNotificationCode code) {
+  auto& connections = static_cast<Core*>(core)->connections_;
+  auto** own = reinterpret_cast<std::shared_ptr<Connection>**>(context);
+  if (code == MHD_CONNECTION_NOTIFY_STARTED) {
+    const int socket = MHD_get_connection_info(connection, MHD_CONNECTION_INFO_CONNECTION_FD)->connect_fd;
+    *own = new std::shared_ptr<Connection>(connections.find(socket));
+  } else if (*own != nullptr) {
+    connections.remove(***own);
+    delete std::exchange(*own, nullptr);
+  }
+}
+
+void* HttpServer::Core::onRequestLine(void*, const char* uri, MHD_Connection* connection) {
+  std::shared_ptr<Connection> client = connectionOf(connection);
+  // The first request's time has run since the connection was made.
+  if (client->phase() == Phase::Idle) client->enter(Phase::Arriving);
+  return new Holder(std::make_shared<HttpExchange>(connection, std::move(client), uri));
+}
+
+MHD_Result HttpServer::Core::onRequest(void* self, MHD_Connection* connection, const char*, const char* method,
+                                       const char* version, const char* data, std::size_t* size, void** holder) {
+  Core& core = *static_cast<Core*>(self);
+  Holder& exchange = *static_cast<Holder*>(*holder);
+  if (!exchange->headIsRead) return core.readHead(exchange, connection, method, version);
+  if (*size > 0) {
+    core.readBody(*exchange, {data, *size});
+    *size = 0;
+    return MHD_YES;
+  }
+  if (exchange->isPublished()) return exchange->respond();
+  return core.requestIsWhole(exchange);
+}
+
+MHD_Result HttpServer::Core::readHead(Holder& exchange, MHD_Connection* connection, const char* method,
+                                      const char* version) {
+  exchange->headIsRead = true;
+  requests_.fetch_add(1, std::memory_order_relaxed);
+  HttpRequest& request = exchange->request;
+  request.method = method;
+  request.client = exchange->client->client();
+  request.headers.reserve(8);
+  MHD_get_connection_values_n(
+      connection, MHD_HEADER_KIND,
+      [](void* headers, MHD_ValueKind, const char* name, std::size_t nameSize, const char* value,
+         std::size_t valueSize) {
+        static_cast<HeaderList*>(headers)->emplace_back(
+            std::string(name, nameSize), value == nullptr ? std::string() : std::string(value, valueSize));
+        return MHD_YES;
+      },
+      &request.headers);
+  exchange->isHttp11 = std::strcmp(version, "HTTP/1.1") == 0;
+
+  const HttpLimits now = limits();
+  if (auto refusal = checkHead({request.method, request.path, version, request.headers}, now.bodyBytes)) {
+    logRefusal(*exchange, *refusal);
+    exchange->client->enter(Phase::Sending);
+    return respondWith(connection, *refusal);
+  }
+  exchange->takesGzip = now.gzip && listHas(request.headers, "Accept-Encoding", "gzip");
+  request.takesTrailers = exchange->isHttp11 && listHas(request.headers, "TE", "trailers");
+  return MHD_YES;
+}
+
+void HttpServer::Core::readBody(HttpExchange& exchange, std::string_view data) {
+  if (exchange.refusal.has_value()) return;  // the rest is read and dropped, for as long as a request may take
+  const HttpLimits now = limits();
+  std::string& body = exchange.request.body;
+  if (data.size() > now.bodyBytes - std::min(body.size(), now.bodyBytes)) {
+    exchange.refusal =
+        Refusal{413, "the body is longer than the " + std::to_string(now.bodyBytes) + " bytes allowed", {}};
+    releaseBody(exchange);
+    return;
+  }
+  body += data;
+  exchange.client->hold(body.size());
+  if (bodies_.fetch_add(data.size()) + data.size() > now.bodiesBytes) connections_.cutSlowestBody();
+}
+
+/// Its body counts as unfinished no more.
+void HttpServer::Core::releaseBody(HttpExchange& exchange) {
+  bodies_ -= exchange.client->held();
+  exchange.client->hold(0);
+}
+
+/// What needs no worker.
+bool HttpServer::Core::answersAtOnce(HttpExchange& exchange) const {
+  const HttpRequest& request = exchange.request;
+  if (request.method == "OPTIONS") {
+    exchange.begin(200, capabilities(request.path));
+  } else if (asksForPage(request.method, request.path)) {
+    exchange.begin(200, {{MHD_HTTP_HEADER_CONTENT_TYPE, "text/plain; charset=utf-8"}});
+    exchange.write(page_);
+  } else {
+    return false;
+  }
+  exchange.finish({});
+  return true;
+}
+
+MHD_Result HttpServer::Core::requestIsWhole(const Holder& exchange) {
+  releaseBody(*exchange);
+  if (answersAtOnce(*exchange)) return exchange->respond();
+  exchange->client->enter(Phase::Working);
+  exchange->suspend();
+  if (!exchange->refusal.has_value()) exchange->refusal = workers_.submit(exchange, connections_);
+  if (exchange->refusal.has_value()) {
+    logRefusal(*exchange, *exchange->refusal);
+    exchange->finish(*exchange->refusal);
+  }
+  return MHD_YES;
+}
+
+void HttpServer::Core::onCompleted(void* self, MHD_Connection*, void** holder, MHD_RequestTerminationCode code) {
+  auto* exchange = static_cast<Holder*>(std::exchange(*holder, nullptr));
+  if (exchange == nullptr) return;
+  Core& core = *static_cast<Core*>(self);
+  (*exchange)->ended();
+  core.releaseBody(**exchange);
+  if (code == MHD_REQUEST_TERMINATED_COMPLETED_OK) {
+    (*exchange)->client->prove();
+    core.logAnswer(**exchange);
+  } else {
+    ZORVA_LOG_CLIENT(Warning, (*exchange)->client->peer() + ": the connection ended within a request");
+  }
+  (*exchange)->client->enter(Phase::Idle);
+  delete exchange;
+}
+
+void HttpServer::Core::logRefusal(const HttpExchange& exchange, const Refusal& refusal) const {
+  ZORVA_LOG_CLIENT(Warning, exchange.client->peer() + " " + exchange.request.method + " " + exchange.request.path +
+                                ": " + std::to_string(refusal.status) + " " + refusal.why);
+}
+
+void HttpServer::Core::logAnswer(const HttpExchange& exchange) const {
+  if (!isLogged(Level::Request) || exchange.status() == 0) return;
+  const std::string* operation = findHeader(exchange.request.headers, "CIMMethod");
+  const auto time =
+      std::chrono::duration_cast<std::chrono::microseconds>(HttpExchange::Clock::now() - exchange.arrived());
+  ZORVA_LOG(Request, exchange.client->peer() + " " + exchange.request.method + " " + exchange.request.path + " " +
+                         (operation == nullptr ? "-" : *operation) + ": " + std::to_string(exchange.status()) + ", " +
+                         std::to_string(exchange.bytesSent()) + " bytes, " + std::to_string(time.count()) + " us");
+}
+
+void HttpServer::Core::onLog(void*, const char* format, va_list arguments) {
+  if (!isLogged(Level::Warning)) return;
+  char text[512];
+  std::vsnprintf(text, sizeof text, format, arguments);
+  ZORVA_LOG_CLIENT(Warning, withoutLineEnd(text));
+}
+
+// ---- HttpServer ----
+
+HttpServer::HttpServer(const HttpLimits& limits, int threads, Handler handler, std::string page)
+    : core_(std::make_unique<Core>(limits, threads, std::move(handler), std::move(page))) {}
+
+HttpServer::~HttpServer() = default;
+
+void HttpServer::take(int socket, const sockaddr_storage& peer, socklen_t peerSize) {
+  core_->take(socket, peer, peerSize);
+}
+
+void HttpServer::setLimits(const HttpLimits& limits) { core_->setLimits(limits); }
+
+void HttpServer::sweep() { core_->sweep(); }
+
+bool HttpServer::isBusy() const { return core_->connectionCount() > 0 || core_->inFlight() > 0; }
+
+std::size_t HttpServer::requestsTaken() const { return core_->requestsTaken(); }
+
+bool HttpServer::hasWork() const { return core_->hasWork(); }
+
+bool HttpServer::stop() { return core_->stop(); }
+
+std::string addressText(const sockaddr_storage& address) {
+  char text[INET6_ADDRSTRLEN] = "";
+  if (address.ss_family == AF_INET6) {
+    sockaddr_in6 v6{};
+    std::memcpy(&v6, &address, sizeof v6);
+    ::inet_ntop(AF_INET6, &v6.sin6_addr, text, sizeof text);
+    return "[" + std::string(text) + "]:" + std::to_string(ntohs(v6.sin6_port));
+  }
+  sockaddr_in v4{};
+  std::memcpy(&v4, &address, sizeof v4);
+  ::inet_ntop(AF_INET, &v4.sin_addr, text, sizeof text);
+  return std::string(text) + ":" + std::to_string(ntohs(v4.sin_port));
+}
+
+}  // namespace zorva::http

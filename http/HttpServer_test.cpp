@@ -1,0 +1,586 @@
+// The HTTP side with handlers that the tests make, over real connections.
+#include "http/HttpServer.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <netinet/in.h>
+#include <poll.h>
+#include <sys/socket.h>
+
+#include <atomic>
+#include <condition_variable>
+#include <mutex>
+#include <thread>
+
+#include "http/Listener.h"
+#include "http/testing/TestWire.h"
+
+namespace zorva::http {
+namespace {
+
+using std::chrono::milliseconds;
+using std::chrono::seconds;
+using ::testing::HasSubstr;
+using testing::Wire;
+using testing::WireResponse;
+
+const HeaderList kXml{{"Content-Type", "application/xml; charset=\"utf-8\""}};
+
+/// A text of that size that does not repeat itself at once.
+std::string longText(std::size_t size) {
+  std::string text;
+  for (std::size_t i = 0; text.size() < size; ++i) text += std::to_string(i * 7919) + "\n";
+  text.resize(size);
+  return text;
+}
+
+/// Something that handlers wait for.
+class Gate {
+ public:
+  void open() {
+    const std::lock_guard lock(mutex_);
+    isOpen_ = true;
+    changed_.notify_all();
+  }
+  void wait() {
+    std::unique_lock lock(mutex_);
+    changed_.wait(lock, [this] { return isOpen_; });
+  }
+
+ private:
+  std::mutex mutex_;
+  std::condition_variable changed_;
+  bool isOpen_ = false;
+};
+
+/// An HTTP server on a free port, with a thread that accepts and sweeps.
+class Server {
+ public:
+  explicit Server(HttpServer::Handler handler, const HttpLimits& limits = {}, std::string page = {})
+      : listeners_(listenOn(Addresses{"127.0.0.1"}, 0)),
+        server_(limits, 2, std::move(handler), std::move(page)),
+        thread_([this] { run(); }) {}
+  ~Server() {
+    ending_ = true;
+    thread_.join();
+  }
+
+  int port() const { return std::stoi(listeners_[0].url.substr(listeners_[0].url.rfind(':') + 1)); }
+  HttpServer& http() { return server_; }
+
+ private:
+  void run() {
+    while (!ending_) {
+      pollfd wait{listeners_[0].socket.get(), POLLIN, 0};
+      ::poll(&wait, 1, 20);
+      for (;;) {
+        sockaddr_storage peer{};
+        socklen_t size = sizeof peer;
+        const int socket = ::accept4(wait.fd, reinterpret_cast<sockaddr*>(&peer), &size, SOCK_NONBLOCK | SOCK_CLOEXEC);
+        if (socket < 0) break;
+        server_.take(socket, peer, size);
+      }
+      server_.sweep();
+    }
+  }
+
+  std::vector<Listener> listeners_;
+  HttpServer server_;
+  std::atomic<bool> ending_ = false;
+  std::thread thread_;
+};
+
+/// Answers with the request's body.
+void echo(const HttpRequest& request, ResponseSink& sink) {
+  sink.begin(200, kXml);
+  sink.write(request.body);
+}
+
+void answer(ResponseSink& sink, std::string_view text) {
+  sink.begin(200, kXml);
+  sink.write(text);
+}
+
+TEST(HttpServer, AConnectionStaysForTheNextRequest) {
+  Server server(echo);
+  Wire wire(server.port());
+  for (const char* text : {"one", "two", "three"}) {
+    ASSERT_TRUE(wire.send(testing::posting(text)));
+    const WireResponse response = wire.receive();
+    EXPECT_EQ(response.status, 200);
+    EXPECT_EQ(response.body, text);
+    EXPECT_EQ(response.headers.at("content-length"), std::to_string(response.body.size()));
+  }
+}
+
+TEST(HttpServer, RequestsThatComeAtOnceAreAnsweredInTheirOrder) {
+  Server server(echo);
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send(testing::posting("one") + testing::posting("two") + testing::posting("three")));
+  EXPECT_EQ(wire.receive().body, "one");
+  EXPECT_EQ(wire.receive().body, "two");
+  EXPECT_EQ(wire.receive().body, "three");
+}
+
+TEST(HttpServer, ABodyMayComeInChunksAndInPieces) {
+  Server server(echo);
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send("POST /x HTTP/1.1\r\nHost: x\r\nTransfer-Encoding: chunked\r\n\r\n"));
+  for (const char* piece : {"3\r\nab", "c\r\n", "A;ext=1\r\n0123456789\r", "\n0\r\n", "\r\n"}) {
+    std::this_thread::sleep_for(milliseconds(5));
+    ASSERT_TRUE(wire.send(piece));
+  }
+  EXPECT_EQ(wire.receive().body, "abc0123456789");
+}
+
+TEST(HttpServer, ExpectationsAreMetBeforeTheBody) {
+  Server server(echo);
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send("POST /x HTTP/1.1\r\nHost: x\r\nContent-Length: 2\r\nExpect: 100-continue\r\n\r\n"));
+  EXPECT_EQ(wire.receive().status, 100);
+  ASSERT_TRUE(wire.send("ok"));
+  EXPECT_EQ(wire.receive().body, "ok");
+}
+
+TEST(HttpServer, ALongResponseIsStreamedWhole) {
+  const std::string text = longText(3'000'000);
+  Server server([&](const HttpRequest&, ResponseSink& sink) { answer(sink, text); });
+  Wire wire(server.port());
+  for (int i = 0; i < 3; ++i) {
+    ASSERT_TRUE(wire.send(testing::posting("x")));
+    const WireResponse response = wire.receive();
+    EXPECT_EQ(response.headers.at("transfer-encoding"), "chunked");
+    EXPECT_TRUE(response.complete);
+    EXPECT_TRUE(response.body == text);
+  }
+}
+
+TEST(HttpServer, AnOldClientGetsALongResponseUpToTheEndOfTheConnection) {
+  const std::string text = longText(300'000);
+  Server server([&](const HttpRequest&, ResponseSink& sink) { answer(sink, text); });
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send("POST /x HTTP/1.0\r\nContent-Length: 1\r\n\r\nx"));
+  const WireResponse response = wire.receive();
+  EXPECT_EQ(response.headers.count("transfer-encoding"), 0U);
+  EXPECT_TRUE(response.body == text);
+}
+
+TEST(HttpServer, ResponsesAreCompressedForWhoAcceptsIt) {
+  for (const std::size_t size : {std::size_t{5'000}, std::size_t{2'000'000}}) {
+    const std::string text = longText(size);
+    Server server([&](const HttpRequest&, ResponseSink& sink) { answer(sink, text); });
+    Wire wire(server.port());
+    ASSERT_TRUE(wire.send(testing::posting("x", "Accept-Encoding: deflate, gzip\r\n")));
+    const WireResponse response = wire.receive();
+    EXPECT_EQ(response.headers.at("content-encoding"), "gzip");
+    EXPECT_LT(response.body.size(), text.size() / 2);
+    EXPECT_TRUE(testing::gunzipped(response.body) == text);
+    ASSERT_TRUE(wire.send(testing::posting("x", "Accept-Encoding: gzip;q=0\r\n")));
+    EXPECT_TRUE(wire.receive().body == text);
+  }
+}
+
+TEST(HttpServer, NoMoreThanAMebibyteIsEverUnsent) {
+  std::atomic<std::size_t> written = 0;
+  const std::string piece = longText(50'000);
+  Server server([&](const HttpRequest&, ResponseSink& sink) {
+    sink.begin(200, kXml);
+    for (int i = 0; i < 400; ++i) {
+      sink.write(piece);
+      written += piece.size();
+    }
+  });
+  Wire wire(server.port(), 4096);
+  ASSERT_TRUE(wire.send(testing::posting("x")));
+  // What the kernel holds for the client comes on top of what the server does.
+  constexpr std::size_t kKernel = std::size_t{6} << 20;
+  std::size_t before = 1;
+  while (before != written) {
+    before = written;
+    std::this_thread::sleep_for(milliseconds(200));
+  }
+  EXPECT_LT(written, (std::size_t{1} << 20) + kKernel);
+  EXPECT_LT(written, 400 * piece.size());
+  const WireResponse response = wire.receive(seconds(60));
+  EXPECT_EQ(response.body.size(), 400 * piece.size());
+}
+
+TEST(HttpServer, AFailureAfterTheBeginningIsToldInTrailers) {
+  for (const std::size_t size : {std::size_t{10}, std::size_t{500'000}}) {
+    Server server([&](const HttpRequest&, ResponseSink& sink) {
+      answer(sink, longText(size));
+      sink.fail(1, "the provider has failed: 100 % \n");
+    });
+    Wire wire(server.port());
+    ASSERT_TRUE(wire.send(testing::posting("x", "TE: trailers\r\n")));
+    const WireResponse response = wire.receive();
+    EXPECT_TRUE(response.complete);
+    EXPECT_EQ(response.body.size(), size);
+    EXPECT_EQ(response.headers.at("trailer"), "CIMStatusCode, CIMStatusCodeDescription");
+    EXPECT_EQ(response.trailers.at("cimstatuscode"), "1");
+    EXPECT_EQ(response.trailers.at("cimstatuscodedescription"), "the provider has failed: 100 %25 %0A");
+  }
+}
+
+TEST(HttpServer, AFailureClosesTheConnectionOfAClientThatTakesNoTrailers) {
+  Server server([&](const HttpRequest&, ResponseSink& sink) {
+    answer(sink, longText(500'000));
+    sink.fail(1, "the provider has failed");
+  });
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send(testing::posting("x")));
+  const WireResponse response = wire.receive();
+  EXPECT_EQ(response.status, 200);
+  EXPECT_FALSE(response.complete);
+  EXPECT_TRUE(wire.isClosedWithin(seconds(10)));
+}
+
+TEST(HttpServer, AHandlerThatThrowsCostsItsOwnRequestOnly) {
+  Server server([](const HttpRequest& request, ResponseSink& sink) {
+    if (request.body == "bad") throw std::runtime_error("out of order");
+    echo(request, sink);
+  });
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send(testing::posting("bad")));
+  const WireResponse response = wire.receive();
+  EXPECT_EQ(response.status, 500);
+  EXPECT_THAT(response.body, HasSubstr("out of order"));
+  ASSERT_TRUE(wire.send(testing::posting("good")));
+  EXPECT_EQ(wire.receive().body, "good");
+}
+
+TEST(HttpServer, AHandlerThatDoesNotReturnIsGivenUpAndTheOthersGoOn) {
+  HttpLimits limits;
+  limits.provider = milliseconds(300);
+  limits.workers = 1;
+  Gate gate;
+  Server server(
+      [&](const HttpRequest& request, ResponseSink& sink) {
+        if (request.body == "hang") gate.wait();
+        echo(request, sink);
+      },
+      limits);
+  Wire hanging(server.port());
+  Wire other(server.port());
+  ASSERT_TRUE(hanging.send(testing::posting("hang")));
+  std::this_thread::sleep_for(milliseconds(50));
+  ASSERT_TRUE(other.send(testing::posting("go")));
+  const WireResponse given = hanging.receive();
+  EXPECT_EQ(given.status, 500);
+  EXPECT_THAT(given.body, HasSubstr("did not return within"));
+  EXPECT_EQ(other.receive().body, "go") << "the only worker is stuck, another takes its place";
+  ASSERT_TRUE(hanging.send(testing::posting("again")));
+  EXPECT_EQ(hanging.receive().body, "again") << "its connection goes on as well";
+  gate.open();
+}
+
+TEST(HttpServer, HandlersThatHangKeepNoWorkerFromOthers) {
+  HttpLimits limits;
+  limits.workers = 4;
+  Gate gate;
+  std::atomic<int> waiting = 0;
+  {
+    Server server(
+        [&](const HttpRequest& request, ResponseSink& sink) {
+          if (request.body == "hang") {
+            ++waiting;
+            gate.wait();
+          }
+          echo(request, sink);
+        },
+        limits);
+    std::vector<std::unique_ptr<Wire>> hanging;
+    for (int i = 0; i < 40; ++i) {
+      hanging.push_back(std::make_unique<Wire>(server.port()));
+      EXPECT_TRUE(hanging.back()->send(testing::posting("hang")));
+    }
+    for (int i = 0; i < 10; ++i) {
+      Wire other(server.port());
+      EXPECT_TRUE(other.send(testing::posting("go")));
+      EXPECT_EQ(other.receive(seconds(10)).body, "go") << i;
+    }
+    for (int i = 0; i < 1000 && waiting < 40; ++i) std::this_thread::sleep_for(milliseconds(10));
+    EXPECT_EQ(waiting, 40) << "and those that wait for a place get one as well";
+    gate.open();
+    for (const auto& each : hanging) EXPECT_EQ(each->receive().body, "hang");
+  }
+}
+
+TEST(HttpServer, AHandlerThatDoesNotReturnIsAnsweredAsItHasSaid) {
+  HttpLimits limits;
+  limits.provider = milliseconds(200);
+  Gate gate;
+  Server server(
+      [&](const HttpRequest&, ResponseSink& sink) {
+        sink.setLateAnswer([](const std::string& why, ResponseSink& late) { answer(late, "late, since " + why); });
+        gate.wait();
+      },
+      limits);
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send(testing::posting("x")));
+  const WireResponse response = wire.receive();
+  EXPECT_EQ(response.status, 200);
+  EXPECT_EQ(response.body, "late, since the provider did not return within 200 ms");
+  gate.open();
+}
+
+TEST(HttpServer, AHandlerCanSeeThatItWasGivenUp) {
+  HttpLimits limits;
+  limits.provider = milliseconds(200);
+  limits.workers = 1;
+  std::atomic<bool> hasSeen = false;
+  Server server(
+      [&](const HttpRequest& request, ResponseSink& sink) {
+        while (request.body == "long" && sink.isWanted()) std::this_thread::sleep_for(milliseconds(1));
+        if (!sink.isWanted()) hasSeen = true;
+        echo(request, sink);
+      },
+      limits);
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send(testing::posting("long")));
+  EXPECT_EQ(wire.receive().status, 500);
+  ASSERT_TRUE(wire.send(testing::posting("short")));
+  EXPECT_EQ(wire.receive().body, "short");
+  for (int i = 0; i < 2000 && !hasSeen; ++i) std::this_thread::sleep_for(milliseconds(5));
+  EXPECT_TRUE(hasSeen);
+}
+
+TEST(HttpServer, AHandlerThatHangsAfterTheBeginningIsToldInTrailers) {
+  HttpLimits limits;
+  limits.provider = milliseconds(300);
+  Gate gate;
+  Server server(
+      [&](const HttpRequest&, ResponseSink& sink) {
+        answer(sink, longText(200'000));
+        gate.wait();
+        sink.write("never seen");
+      },
+      limits);
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send(testing::posting("x", "TE: trailers\r\n")));
+  const WireResponse response = wire.receive();
+  EXPECT_TRUE(response.complete);
+  EXPECT_EQ(response.body.size(), 200'000U);
+  EXPECT_EQ(response.trailers.at("cimstatuscode"), "1");
+  gate.open();
+}
+
+TEST(HttpServer, AClientThatGoesEndsTheWorkForIt) {
+  Gate gone;
+  Server server([&](const HttpRequest&, ResponseSink& sink) {
+    sink.begin(200, kXml);
+    try {
+      for (;;) sink.write(longText(60'000));
+    } catch (const ClientGone&) {
+      gone.open();
+      throw;
+    }
+  });
+  {
+    Wire wire(server.port());
+    ASSERT_TRUE(wire.send(testing::posting("x")));
+    EXPECT_FALSE(wire.take(100, seconds(10)).empty());
+  }
+  gone.wait();
+}
+
+TEST(HttpServer, ABodyThatGrowsTooLongIsRefused) {
+  HttpLimits limits;
+  limits.bodyBytes = 1000;
+  Server server(echo, limits);
+  Wire wire(server.port());
+  std::string request = "POST /x HTTP/1.1\r\nHost: x\r\nTransfer-Encoding: chunked\r\n\r\n";
+  for (int i = 0; i < 20; ++i) request += "64\r\n" + std::string(100, 'x') + "\r\n";
+  ASSERT_TRUE(wire.send(request + "0\r\n\r\n"));
+  const WireResponse response = wire.receive();
+  EXPECT_EQ(response.status, 413);
+  EXPECT_THAT(response.body, HasSubstr("1000 bytes"));
+}
+
+TEST(HttpServer, UnfinishedBodiesTogetherTakeNoMoreThanTheirShare) {
+  HttpLimits limits;
+  limits.bodyBytes = 100'000;
+  limits.bodiesBytes = 300'000;
+  Server server(echo, limits);
+  std::vector<std::unique_ptr<Wire>> hoarders;
+  for (int i = 0; i < 6; ++i) {
+    hoarders.push_back(std::make_unique<Wire>(server.port()));
+    ASSERT_TRUE(hoarders.back()->send("POST /x HTTP/1.1\r\nHost: x\r\nContent-Length: 100000\r\n\r\n" +
+                                      std::string(99'000, 'x')));
+    std::this_thread::sleep_for(milliseconds(20));
+  }
+  EXPECT_TRUE(hoarders[0]->isClosedWithin(seconds(10))) << "the one that has taken longest gives way";
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send(testing::posting("works")));
+  EXPECT_EQ(wire.receive().body, "works");
+}
+
+TEST(HttpServer, ARequestThatTricklesInIsCutOffInTime) {
+  HttpLimits limits;
+  limits.arrival = milliseconds(400);
+  Server server(echo, limits);
+  Wire inHead(server.port());
+  Wire inBody(server.port());
+  ASSERT_TRUE(inHead.send("POST /x HT"));
+  ASSERT_TRUE(inBody.send("POST /x HTTP/1.1\r\nHost: x\r\nContent-Length: 1000\r\n\r\n"));
+  const auto start = std::chrono::steady_clock::now();
+  bool headOpen = true;
+  bool bodyOpen = true;
+  while ((headOpen || bodyOpen) && std::chrono::steady_clock::now() - start < seconds(10)) {
+    if (headOpen) headOpen = inHead.send("T") && !inHead.isClosedWithin(milliseconds(10));
+    if (bodyOpen) bodyOpen = inBody.send("x") && !inBody.isClosedWithin(milliseconds(10));
+  }
+  EXPECT_FALSE(headOpen);
+  EXPECT_FALSE(bodyOpen);
+}
+
+TEST(HttpServer, ASilentConnectionIsCutOffInTime) {
+  HttpLimits limits;
+  limits.idle = milliseconds(200);
+  limits.arrival = milliseconds(300);
+  Server server(echo, limits);
+  Wire silent(server.port());
+  Wire idle(server.port());
+  ASSERT_TRUE(idle.send(testing::posting("x")));
+  EXPECT_EQ(idle.receive().body, "x");
+  EXPECT_TRUE(idle.isClosedWithin(seconds(10)));
+  EXPECT_TRUE(silent.isClosedWithin(seconds(10)));
+}
+
+TEST(HttpServer, AClientThatTakesNothingOfItsResponseIsCutOff) {
+  HttpLimits limits;
+  limits.client = milliseconds(300);
+  Gate gone;
+  Server server(
+      [&](const HttpRequest&, ResponseSink& sink) {
+        sink.begin(200, kXml);
+        try {
+          for (;;) sink.write(longText(60'000));
+        } catch (const ClientGone&) {
+          gone.open();
+          throw;
+        }
+      },
+      limits);
+  Wire wire(server.port(), 4096);
+  ASSERT_TRUE(wire.send(testing::posting("x")));
+  gone.wait();
+}
+
+TEST(HttpServer, ClientsThatLetTheirResponsesWaitTakeNoWorkerFromOthers) {
+  HttpLimits limits;
+  limits.workers = 2;
+  limits.requests = 8;
+  const std::string text = longText(20'000'000);
+  Server server(
+      [&](const HttpRequest& request, ResponseSink& sink) { answer(sink, request.body == "much" ? text : "little"); },
+      limits);
+  std::vector<std::unique_ptr<Wire>> slow;
+  for (int i = 0; i < 8; ++i) {
+    slow.push_back(std::make_unique<Wire>(server.port(), 4096));
+    ASSERT_TRUE(slow.back()->send(testing::posting("much")));
+  }
+  std::this_thread::sleep_for(milliseconds(1500));
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send(testing::posting("x")));
+  EXPECT_EQ(wire.receive().body, "little") << "one of the eight has given way";
+}
+
+TEST(HttpServer, AThousandSlowAndHalfOpenClientsLeaveAWorkingOneUnharmed) {
+  HttpLimits limits;
+  limits.connections = 200;
+  Server server(echo, limits);
+  Wire working(server.port());
+  ASSERT_TRUE(working.send(testing::posting("before")));
+  ASSERT_EQ(working.receive().body, "before");
+
+  constexpr const char* kBeginnings[] = {"", "POST /cimom HT", "POST /x HTTP/1.1\r\nHost: x\r\nX-Slow: ",
+                                         "POST /x HTTP/1.1\r\nHost: x\r\nContent-Length: 5000\r\n\r\n<?xml"};
+  std::vector<std::unique_ptr<Wire>> slow;
+  for (int i = 0; i < 1000; ++i) {
+    slow.push_back(std::make_unique<Wire>(server.port()));
+    slow.back()->send(kBeginnings[i % 4]);
+    if (i % 50 != 0) continue;
+    ASSERT_TRUE(working.send(testing::posting("during " + std::to_string(i)))) << i;
+    ASSERT_EQ(working.receive(seconds(5)).body, "during " + std::to_string(i));
+    Wire newcomer(server.port());
+    ASSERT_TRUE(newcomer.send(testing::posting("new"))) << i;
+    ASSERT_EQ(newcomer.receive(seconds(5)).body, "new") << i;
+  }
+  EXPECT_TRUE(slow[0]->isClosedWithin(seconds(10))) << "the oldest of them had to go";
+}
+
+TEST(HttpServer, OptionsTellWhatTheServerCan) {
+  Server server(echo);
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send("OPTIONS * HTTP/1.1\r\nHost: x\r\n\r\n"));
+  const WireResponse response = wire.receive();
+  EXPECT_EQ(response.status, 200);
+  EXPECT_EQ(response.headers.at("allow"), "POST, M-POST, OPTIONS");
+  EXPECT_EQ(response.headers.at("77-cimprotocolversion"), "1.4");
+  ASSERT_EQ(response.headers.count("77-cimsupportedmultipleoperations"), 1U);
+  EXPECT_EQ(response.headers.at("77-cimsupportedmultipleoperations"), "");
+}
+
+TEST(HttpServer, HeaderFieldsWithoutAValueAreSent) {
+  Server server([](const HttpRequest&, ResponseSink& sink) {
+    sink.begin(200, {{"Content-Type", "application/xml"}, {"Ext", ""}});
+    sink.write("x");
+  });
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send(testing::posting("x")));
+  const WireResponse response = wire.receive();
+  ASSERT_EQ(response.headers.count("ext"), 1U);
+  EXPECT_EQ(response.headers.at("ext"), "");
+}
+
+TEST(HttpServer, TheRootSaysToAPersonWhatThisIs) {
+  Server server(echo, {}, "This is a server.\n");
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send("GET / HTTP/1.1\r\nHost: x\r\n\r\n"));
+  const WireResponse page = wire.receive();
+  EXPECT_EQ(page.status, 200);
+  EXPECT_EQ(page.headers.at("content-type"), "text/plain; charset=utf-8");
+  EXPECT_EQ(page.body, "This is a server.\n");
+  ASSERT_TRUE(wire.send("HEAD / HTTP/1.1\r\nHost: x\r\nConnection: close\r\n\r\n"));
+  const std::string head = wire.take(10000, seconds(20));
+  EXPECT_THAT(head, ::testing::StartsWith("HTTP/1.1 200 "));
+  EXPECT_THAT(head, ::testing::EndsWith("\r\n\r\n"));
+}
+
+TEST(HttpServer, OtherMethodsAreTurnedDown) {
+  Server server(echo);
+  Wire get(server.port());
+  ASSERT_TRUE(get.send("GET /cimom HTTP/1.1\r\nHost: x\r\n\r\n"));
+  const WireResponse response = get.receive();
+  EXPECT_EQ(response.status, 405);
+  EXPECT_EQ(response.headers.at("allow"), "POST, M-POST, OPTIONS");
+  Wire brew(server.port());
+  ASSERT_TRUE(brew.send("BREW / HTTP/1.1\r\nHost: x\r\n\r\n"));
+  EXPECT_EQ(brew.receive().status, 501);
+}
+
+TEST(HttpServer, StopWaitsForWhatIsInWorkAndGivesUpTheRest) {
+  HttpLimits limits;
+  limits.drain = milliseconds(300);
+  Gate gate;
+  Server server(
+      [&](const HttpRequest& request, ResponseSink& sink) {
+        if (request.body == "hang") gate.wait();
+        if (request.body == "slow") std::this_thread::sleep_for(milliseconds(100));
+        echo(request, sink);
+      },
+      limits);
+  Wire slow(server.port());
+  Wire hanging(server.port());
+  ASSERT_TRUE(slow.send(testing::posting("slow")));
+  ASSERT_TRUE(hanging.send(testing::posting("hang")));
+  std::this_thread::sleep_for(milliseconds(50));
+  EXPECT_FALSE(server.http().stop()) << "a handler is stuck";
+  EXPECT_EQ(slow.receive().body, "slow");
+  EXPECT_THAT(hanging.receive().body, HasSubstr("the server is ending"));
+  gate.open();
+}
+
+}  // namespace
+}  // namespace zorva::http

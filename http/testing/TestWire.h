@@ -1,0 +1,62 @@
+#pragma once
+
+#include <chrono>
+#include <map>
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "http/Listener.h"
+
+// For tests: a client that says on the wire what it is told to, be it HTTP or not.
+
+namespace zorva::http::testing {
+
+/// A response as it came.
+struct WireResponse {
+  int status = 0;
+  std::map<std::string, std::string> headers;  ///< names in small letters
+  std::string body;                            ///< without the chunks around it
+  std::map<std::string, std::string> trailers;
+  bool complete = false;  ///< it ended as it had announced
+};
+
+class Wire {
+ public:
+  /// Connects to 127.0.0.1; a receive buffer of that size, where one is given, makes a client that takes little at
+  /// once.
+  explicit Wire(int port, int receiveBuffer = 0);
+
+  /// False: the other side is gone.
+  bool send(std::string_view bytes);
+
+  /// The next response; a status of 0 where the connection ends without one. Waits no longer than `most` in all.
+  WireResponse receive(std::chrono::milliseconds most = std::chrono::seconds(20));
+
+  /// Whether the other side closes within that time; what it sends until then is dropped.
+  bool isClosedWithin(std::chrono::milliseconds time);
+
+  /// Takes up to that many bytes that are there or come within the time.
+  std::string take(std::size_t most, std::chrono::milliseconds time);
+
+ private:
+  bool fill(std::chrono::steady_clock::time_point deadline);
+  std::optional<std::string> line(std::chrono::steady_clock::time_point deadline);
+  bool bytes(std::size_t count, std::string& out, std::chrono::steady_clock::time_point deadline);
+  bool chunks(WireResponse& response, std::chrono::steady_clock::time_point deadline);
+  bool fields(std::map<std::string, std::string>& out, std::chrono::steady_clock::time_point deadline);
+
+  Descriptor socket_;
+  std::string unread_;
+};
+
+/// A POST with that body; `fields` are further header lines, each with its line end.
+std::string posting(std::string_view body, std::string_view fields = {});
+
+/// The same for the instance names of a class of root/cimv2.
+std::string enumeration(std::string_view operation, std::string_view className, std::string_view fields = {});
+
+/// The text that a gzip member holds; empty where it is none.
+std::string gunzipped(const std::string& text);
+
+}  // namespace zorva::http::testing

@@ -1,0 +1,36 @@
+#include "server/BrokerLog.h"
+
+#include <cstddef>
+
+#include "http/Log.h"
+
+namespace zorva::server {
+
+namespace {
+
+http::Level levelOf(broker::LogLevel level) {
+  constexpr int kLevels[] = {3000, 4000, 5000, 6000};
+  return static_cast<http::Level>(kLevels[static_cast<std::size_t>(level)]);
+}
+
+}  // namespace
+
+void logServiceLine(broker::LogLevel level, std::string_view text) noexcept try {
+  http::logClientLine(levelOf(level), std::string(text), "service", __FILE__, __LINE__);
+} catch (...) {
+  // Lost, as a line that cannot be written.
+}
+
+void logChange(const std::string& line) noexcept {
+  http::logLine(http::Level::Change, line, "service", __FILE__, __LINE__);
+}
+
+void logBrokerLine(broker::LogLevel level, std::string_view text) noexcept try {
+  if (http::isLogged(levelOf(level))) {
+    http::logLine(levelOf(level), std::string(text), "broker", __FILE__, __LINE__);
+  }
+} catch (...) {
+  // Lost, as a line that cannot be written.
+}
+
+}  // namespace zorva::server
