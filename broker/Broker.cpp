@@ -274,7 +274,7 @@ Status makeArguments(Arena& arena, const schema::ClassMethod& method, const std:
       Status status =
           makeData(arena, declaredType(parameter), argument.value, method.name + "." + parameter.name, data);
       if (!status.ok()) return {CMPI_RC_ERR_INVALID_PARAMETER, std::move(status.message)};
-      arguments.set(arena, arena.intern(parameter.name), data);
+      arguments.set(arena, intern(arena, parameter.name), data);
     }
     if (arguments.find(argument.name) == nullptr) {
       return {CMPI_RC_ERR_INVALID_PARAMETER, method.name + " has no parameter " + argument.name};

@@ -7,17 +7,16 @@
 #include <string>
 #include <vector>
 
+#include "factory/FactoryLog.h"
 #include "model/DNSClient.h"
 #include "model/DNSServer.h"
 
 namespace ZV {
 
-extern const std::string loggerDNSObjFactory;
-
 // Built on the stack of one operation, which it belongs to; building it reads the host. The CMPI objects that it makes
 // belong to the broker.
 //
-// Functions that return an unsigned short give 0 for success; what else they give is a log pair's worth of failure,
+// Functions that return an unsigned short give 0 for success; what else they give is a failure that is only logged,
 // never a code in the status. status or rc is handed to the broker's calls and must not be null; ref gives the
 // namespace of every path that is made, this system's name is its host. What cannot be made stands in the result as the
 // broker gave it.

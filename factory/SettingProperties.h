@@ -6,7 +6,7 @@
 #include <vector>
 
 #include "factory/CmpiSupport.h"
-#include "factory/DNSClientObjFactory.h"
+#include "factory/FactoryLog.h"
 #include "trace/Trace.h"
 
 namespace ZV {

@@ -16,6 +16,7 @@
 #include <thread>
 #include <utility>
 
+#include "http/AddressText.h"
 #include "http/ClientIdentity.h"
 #include "http/Connections.h"
 #include "http/HttpExchange.h"
@@ -344,19 +345,5 @@ std::size_t HttpServer::requestsTaken() const { return core_->requestsTaken(); }
 bool HttpServer::hasWork() const { return core_->hasWork(); }
 
 bool HttpServer::stop() { return core_->stop(); }
-
-std::string addressText(const sockaddr_storage& address) {
-  char text[INET6_ADDRSTRLEN] = "";
-  if (address.ss_family == AF_INET6) {
-    sockaddr_in6 v6{};
-    std::memcpy(&v6, &address, sizeof v6);
-    ::inet_ntop(AF_INET6, &v6.sin6_addr, text, sizeof text);
-    return "[" + std::string(text) + "]:" + std::to_string(ntohs(v6.sin6_port));
-  }
-  sockaddr_in v4{};
-  std::memcpy(&v4, &address, sizeof v4);
-  ::inet_ntop(AF_INET, &v4.sin_addr, text, sizeof text);
-  return std::string(text) + ":" + std::to_string(ntohs(v4.sin_port));
-}
 
 }  // namespace zorva::http

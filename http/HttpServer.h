@@ -60,7 +60,4 @@ class HttpServer {
   std::unique_ptr<Core> core_;
 };
 
-/// "192.0.2.1:80" or "[2001:db8::1]:80".
-std::string addressText(const sockaddr_storage& address);
-
 }  // namespace zorva::http

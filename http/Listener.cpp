@@ -14,7 +14,7 @@
 #include <system_error>
 #include <utility>
 
-#include "http/HttpServer.h"
+#include "http/AddressText.h"
 #include "http/Log.h"
 
 namespace zorva::http {

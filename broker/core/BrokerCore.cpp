@@ -20,7 +20,8 @@ BrokerCore::BrokerCore(std::shared_ptr<const schema::ClassRepository> classes, B
       registry_(std::move(options.registry)),
       log_(std::move(options.log)),
       claim_(std::move(options.claim)),
-      loader_(*this, registry_, std::move(options.providerDirectory), std::move(options.linked)) {}
+      loader_({&handle_, classes_, blocks_, [this](const std::string& warning) { log(LogLevel::Warning, warning); }},
+              registry_, std::move(options.providerDirectory), std::move(options.linked)) {}
 
 BrokerCore::~BrokerCore() = default;
 

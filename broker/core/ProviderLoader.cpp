@@ -7,7 +7,7 @@
 #include <exception>
 #include <set>
 
-#include "broker/core/BrokerCore.h"
+#include "broker/objects/ClassTable.h"
 #include "broker/objects/Data.h"
 #include "broker/objects/Scope.h"
 
@@ -36,9 +36,9 @@ std::vector<std::string> candidates(const std::string& directory, const std::str
 
 }  // namespace
 
-ProviderLoader::ProviderLoader(BrokerCore& core, const ProviderRegistry& registry, std::string directory,
+ProviderLoader::ProviderLoader(LoaderHost host, const ProviderRegistry& registry, std::string directory,
                                std::vector<LinkedFunction> linked)
-    : core_(core), directory_(std::move(directory)), linked_(std::move(linked)) {
+    : host_(std::move(host)), directory_(std::move(directory)), linked_(std::move(linked)) {
   for (const ProviderEntry& entry : registry.entries()) {
     auto known = std::find_if(providers_.begin(), providers_.end(), [&](const auto& provider) {
       return provider->prefix == entry.prefix && provider->library == entry.library;
@@ -65,12 +65,12 @@ bool ProviderLoader::cleanUp(Provider& provider, std::atomic<const Mi*> Provider
   const Mi* mi = (provider.*slot).load();
   if (mi == nullptr || mi->ft->cleanup == nullptr) return false;
   try {
-    Scope scope(core_.classes(), core_.blocks());
+    Scope scope(host_.classes, host_.blocks);
     auto* context = scope.arena().make<ContextObject>(scope.arena());
     const CMPIStatus status = mi->ft->cleanup(const_cast<Mi*>(mi), context, 1);
     return status.rc == CMPI_RC_DO_NOT_UNLOAD || status.rc == CMPI_RC_NEVER_UNLOAD;
   } catch (...) {
-    core_.log(LogLevel::Warning, provider.prefix + " threw an exception out of its cleanup");
+    host_.warn(provider.prefix + " threw an exception out of its cleanup");
     return false;
   }
 }
@@ -158,13 +158,13 @@ const Mi* ProviderLoader::make(const Provider& provider, const char* kind, Statu
   const auto create = reinterpret_cast<Create>(findFunction(provider, function, status));
   status.rc = CMPI_RC_ERR_FAILED;
   if (create == nullptr) return nullptr;
-  Scope scope(core_.classes(), core_.blocks());
+  Scope scope(host_.classes, host_.blocks);
   auto* context = scope.arena().make<ContextObject>(scope.arena());
   context->setText(CMPIInitNameSpace, provider.nameSpace);
   CMPIStatus created{CMPI_RC_OK, nullptr};
   Mi* mi = nullptr;
   try {
-    mi = create(core_.handle(), context, &created);
+    mi = create(host_.handle, context, &created);
   } catch (const std::exception& problem) {
     status.message = function + " threw an exception: " + problem.what();
     return nullptr;

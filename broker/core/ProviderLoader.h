@@ -1,12 +1,14 @@
 #pragma once
 
 #include <atomic>
+#include <functional>
 #include <memory>
 #include <mutex>
 #include <string>
 #include <unordered_map>
 #include <vector>
 
+#include "broker/core/BrokerOptions.h"
 #include "broker/core/ProviderRegistry.h"
 #include "broker/objects/Value.h"
 #include "cmpidt.h"
@@ -18,12 +20,20 @@
 
 namespace zorva::broker {
 
-class BrokerCore;
-struct LinkedFunction;
+class BlockCache;
+class ClassTable;
+
+/// What the loader needs of its broker.
+struct LoaderHost {
+  const CMPIBroker* handle;  ///< given to create functions
+  const ClassTable& classes;
+  BlockCache& blocks;
+  std::function<void(const std::string& warning)> warn;  ///< does not throw
+};
 
 class ProviderLoader {
  public:
-  ProviderLoader(BrokerCore& core, const ProviderRegistry& registry, std::string directory,
+  ProviderLoader(LoaderHost host, const ProviderRegistry& registry, std::string directory,
                  std::vector<LinkedFunction> linked);
 
   /// Calls the cleanup of every MI that was made, then closes the libraries, save those that ask to stay.
@@ -67,7 +77,7 @@ class ProviderLoader {
   template <class Mi>
   bool cleanUp(Provider& provider, std::atomic<const Mi*> Provider::*slot) noexcept;
 
-  BrokerCore& core_;
+  const LoaderHost host_;
   const std::string directory_;
   const std::vector<LinkedFunction> linked_;
   std::vector<std::unique_ptr<Provider>> providers_;

@@ -4,8 +4,6 @@
 #include <cstring>
 
 #include "broker/objects/BlockCache.h"
-#include "broker/objects/ClassTable.h"
-#include "broker/objects/Objects.h"
 
 namespace zorva::broker {
 
@@ -51,28 +49,6 @@ const char* Arena::text(std::string_view text) {
   if (!text.empty()) std::memcpy(copy, text.data(), text.size());
   copy[text.size()] = '\0';
   return copy;
-}
-
-const ClassInfo* Arena::findClass(std::string_view name) {
-  if (classes_ == nullptr) return nullptr;
-  if (shared_) return classes_->find(name);
-  for (const ClassInfo* known : recentClasses_) {
-    if (known != nullptr && schema::sameName(known->name(), name)) return known;
-  }
-  const ClassInfo* found = classes_->find(name);
-  if (found != nullptr) recentClasses_[nextClass_++ % kRemembered] = found;
-  return found;
-}
-
-StringObject* Arena::intern(std::string_view text) {
-  if (text.empty()) return &emptyString();
-  if (shared_) return StringObject::make(*this, text);
-  for (StringObject* known : recentTexts_) {
-    if (known != nullptr && known->view() == text) return known;
-  }
-  StringObject* made = StringObject::make(*this, text);
-  recentTexts_[nextText_++ % kRemembered] = made;
-  return made;
 }
 
 }  // namespace zorva::broker

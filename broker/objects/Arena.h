@@ -20,6 +20,16 @@ class ClassTable;
 struct MemoryBlock;
 struct StringObject;
 
+/// The last few classes and texts that were asked for: an operation makes many objects of few classes, and namespaces,
+/// hosts and names repeat.
+struct RecentNames {
+  static constexpr unsigned kRemembered = 4;
+  const ClassInfo* classes[kRemembered] = {};
+  StringObject* texts[kRemembered] = {};
+  unsigned nextClass = 0;
+  unsigned nextText = 0;
+};
+
 class Arena {
  public:
   /// `classes` is what objects in this arena ask about their class; it outlives the arena. Null only where neither a
@@ -65,21 +75,16 @@ class Arena {
   const void* root() const noexcept { return root_; }
   void setRoot(const void* root) noexcept { root_ = root; }
 
-  /// The class of that name, or null. The last few are remembered: an operation makes many objects of few classes.
-  const ClassInfo* findClass(std::string_view name);
-
-  /// A text object with that content, an earlier one where it is among the last few: namespaces, hosts and names
-  /// repeat.
-  StringObject* intern(std::string_view text);
+  /// What findClass() and intern() remember in this arena.
+  RecentNames& recent() noexcept { return recent_; }
 
   /// Bytes of memory held.
   std::size_t size() const noexcept { return size_; }
 
  private:
   static constexpr std::size_t kAlignment = 8;
-  // No object of a request is larger: what asks for more is mistaken, and the machine should not try to please it.
+  // No object of a request is larger: what asks for more is mistaken.
   static constexpr std::size_t kMost = static_cast<std::size_t>(1) << 30;
-  static constexpr unsigned kRemembered = 4;
 
   void* take(std::size_t size) {
     const std::size_t rounded = (size + kAlignment - 1) & ~(kAlignment - 1);
@@ -102,10 +107,7 @@ class Arena {
   const void* root_ = nullptr;
   bool shared_ = false;
   std::mutex mutex_;
-  const ClassInfo* recentClasses_[kRemembered] = {};
-  StringObject* recentTexts_[kRemembered] = {};
-  unsigned nextClass_ = 0;
-  unsigned nextText_ = 0;
+  RecentNames recent_;
 };
 
 }  // namespace zorva::broker

@@ -13,7 +13,7 @@ CMPIStatus addArg(const CMPIArgs* handle, const char* name, const CMPIValue* val
   CMPIData data;
   const CMPIrc rc = importData(*self->arena, value, type, data);
   if (rc != CMPI_RC_OK) return {rc, nullptr};
-  self->list.set(*self->arena, self->arena->intern(name), data);
+  self->list.set(*self->arena, intern(*self->arena, name), data);
   return {CMPI_RC_OK, nullptr};
 }
 

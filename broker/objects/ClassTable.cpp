@@ -84,6 +84,18 @@ const ClassInfo* ClassTable::find(std::string_view name) const {
   return classes_.try_emplace(declared->name(), std::move(made)).first->second.get();
 }
 
+const ClassInfo* findClass(Arena& arena, std::string_view name) {
+  if (arena.classes() == nullptr) return nullptr;
+  if (arena.isShared()) return arena.classes()->find(name);
+  RecentNames& recent = arena.recent();
+  for (const ClassInfo* known : recent.classes) {
+    if (known != nullptr && schema::sameName(known->name(), name)) return known;
+  }
+  const ClassInfo* found = arena.classes()->find(name);
+  if (found != nullptr) recent.classes[recent.nextClass++ % RecentNames::kRemembered] = found;
+  return found;
+}
+
 CMPIType cmpiType(schema::Type type, bool isArray) noexcept {
   CMPIType simple = CMPI_string;
   switch (type) {

@@ -82,6 +82,9 @@ class ClassTable {
       classes_;
 };
 
+/// The class of that name in the class table of `arena`, or null. Classes that were asked for last are found at once.
+const ClassInfo* findClass(Arena& arena, std::string_view name);
+
 /// The CMPI type of a schema's type.
 CMPIType cmpiType(schema::Type type, bool isArray) noexcept;
 

@@ -404,7 +404,7 @@ Status makePath(Arena& arena, const ObjectPath& path, bool classMustExist, PathO
     CMPIData data;
     Status status = makeData(arena, key.value, key.name, data);
     if (!status.ok()) return status;
-    object->keys.set(arena, arena.intern(key.name), data);
+    object->keys.set(arena, intern(arena, key.name), data);
   }
   return {};
 }

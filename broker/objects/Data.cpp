@@ -216,7 +216,7 @@ bool isUnchanging(const EntryList::Entry& entry) noexcept {
 /// Namespaces and hosts are the same in most objects: one text in the new arena serves them all.
 StringObject* copyName(Arena& arena, const StringObject& name) {
   if (name.arena == nullptr || name.arena == &arena) return const_cast<StringObject*>(&name);
-  return arena.intern(name.view());
+  return intern(arena, name.view());
 }
 
 }  // namespace
@@ -316,7 +316,7 @@ PathObject* adoptPath(Arena& arena, const CMPIObjectPath* handle) {
     const CMPIData data = handle->ft->getKeyAt(handle, i, &name, &status);
     const std::string_view spelling = textOf(name);
     const PropertyInfo* known = path->info != nullptr ? path->info->find(spelling) : nullptr;
-    path->keys.set(arena, known != nullptr ? known->name : arena.intern(spelling), adoptData(arena, data));
+    path->keys.set(arena, known != nullptr ? known->name : intern(arena, spelling), adoptData(arena, data));
   }
   return path;
 }

@@ -46,6 +46,9 @@ struct StringObject : CMPIString {
 /// The empty text, for what is not set.
 StringObject& emptyString() noexcept;
 
+/// A text object with that content, an earlier one where it is among the last few that were asked for.
+StringObject* intern(Arena& arena, std::string_view text);
+
 /// A property as a class has it.
 struct PropertyInfo {
   const schema::ClassProperty* declared;

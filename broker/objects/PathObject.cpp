@@ -64,7 +64,7 @@ CMPIStatus addKey(CMPIObjectPath* handle, const char* name, const CMPIValue* val
   if (known != nullptr && fitData(*known, data) != CMPI_RC_OK) {
     return statusOf(CMPI_RC_ERR_TYPE_MISMATCH, std::string(name) + " is declared with another type");
   }
-  self->keys.set(*self->arena, known != nullptr ? known->name : self->arena->intern(name), data);
+  self->keys.set(*self->arena, known != nullptr ? known->name : intern(*self->arena, name), data);
   return {CMPI_RC_OK, nullptr};
 }
 
@@ -189,11 +189,11 @@ PathObject* PathObject::make(Arena& arena, std::string_view nameSpace, std::stri
 }
 
 void PathObject::setClass(std::string_view name) {
-  if (const ClassInfo* known = arena->findClass(name)) {
+  if (const ClassInfo* known = findClass(*arena, name)) {
     setClass(*known);
   } else {
     info = nullptr;
-    className = arena->intern(name);
+    className = intern(*arena, name);
   }
 }
 
@@ -203,11 +203,11 @@ void PathObject::setClass(const ClassInfo& known) noexcept {
 }
 
 void PathObject::setNameSpace(std::string_view name) {
-  if (nameSpace->view() != name) nameSpace = arena->intern(name);
+  if (nameSpace->view() != name) nameSpace = intern(*arena, name);
 }
 
 void PathObject::setHost(std::string_view name) {
-  if (host->view() != name) host = arena->intern(name);
+  if (host->view() != name) host = intern(*arena, name);
 }
 
 }  // namespace zorva::broker

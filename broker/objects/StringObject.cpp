@@ -54,4 +54,16 @@ CMPIStatus statusOf(CMPIrc rc, std::string_view message) noexcept {
   return status;
 }
 
+StringObject* intern(Arena& arena, std::string_view text) {
+  if (text.empty()) return &emptyString();
+  if (arena.isShared()) return StringObject::make(arena, text);
+  RecentNames& recent = arena.recent();
+  for (StringObject* known : recent.texts) {
+    if (known != nullptr && known->view() == text) return known;
+  }
+  StringObject* made = StringObject::make(arena, text);
+  recent.texts[recent.nextText++ % RecentNames::kRemembered] = made;
+  return made;
+}
+
 }  // namespace zorva::broker

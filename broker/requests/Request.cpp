@@ -532,7 +532,7 @@ Status checkedArguments(const schema::ClassMethod& method, const EntryList& inpu
       return failure(CMPI_RC_ERR_TYPE_MISMATCH,
                      method.name + ": the parameter " + parameter->name + " is declared with another type");
     }
-    arguments.list.set(*arguments.arena, arguments.arena->intern(parameter->name), data);
+    arguments.list.set(*arguments.arena, intern(*arguments.arena, parameter->name), data);
   }
   return {};
 }

@@ -12,7 +12,7 @@ bool ResultFilter::takeInstance(const InstanceObject& instance) {
   const InstanceObject* named = &instance;
   if (instance.nameSpace->length == 0) {
     InstanceObject* copy = copyInstance(scope_.arena(), instance);
-    copy->nameSpace = scope_.arena().intern(nameSpace_);
+    copy->nameSpace = intern(scope_.arena(), nameSpace_);
     named = copy;
   }
   full_ = !taker_.takeInstance(*named, maskOf(*instance.info));
