@@ -105,7 +105,8 @@ function(zorva_build_as_test target)
   endif()
 endfunction()
 
-# zorva_add_test(NAME SOURCES files... LIBS libraries...): one GoogleTest program; each of its tests is a ctest test.
+# zorva_add_test(NAME SOURCES files... LIBS libraries...): one GoogleTest program; each of its tests is a ctest test with
+# the label NAME.
 function(zorva_add_test name)
   if(NOT ZORVA_BUILD_TESTS)
     return()
@@ -121,5 +122,5 @@ function(zorva_add_test name)
   if(ARG_DEPENDS)
     add_dependencies(${name} ${ARG_DEPENDS})
   endif()
-  gtest_discover_tests(${name} DISCOVERY_MODE PRE_TEST NO_PRETTY_VALUES PROPERTIES TIMEOUT 300)
+  gtest_discover_tests(${name} DISCOVERY_MODE PRE_TEST NO_PRETTY_VALUES PROPERTIES TIMEOUT 300 LABELS ${name})
 endfunction()
