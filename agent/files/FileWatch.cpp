@@ -151,7 +151,7 @@ void FileWatch::watchWay(const std::string& path) {
     if (!target.empty()) {
       if (++links > kMostLinks) return;
       if (target.starts_with('/')) directory = "/";
-      rest = target + '/' + rest;
+      rest.insert(0, target + '/');
     } else if (rest.empty()) {
       add(here, kFileEvents, {});
     } else {

@@ -34,7 +34,7 @@ std::string domainInLine(const std::string& host, const StringList& words) {
 
 std::string domainInHosts(const std::string& host, std::string_view hosts) {
   while (!hosts.empty()) {
-    const std::string domain = domainInLine(host, wordsOf(takeLine(hosts)));
+    std::string domain = domainInLine(host, wordsOf(takeLine(hosts)));
     if (!domain.empty()) return domain;
   }
   return {};

@@ -17,7 +17,7 @@ struct MemoryBlock {
 class BlockCache {
  public:
   /// The size of the blocks that are kept.
-  static constexpr std::size_t kBlock = 256 * 1024 - sizeof(MemoryBlock);
+  static constexpr std::size_t kBlock = std::size_t{256} * 1024 - sizeof(MemoryBlock);
   /// How many are kept. A server that has rested holds no more than this.
   static constexpr std::size_t kMostBlocks = 16;
 

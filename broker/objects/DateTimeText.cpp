@@ -11,7 +11,7 @@ namespace {
 constexpr std::size_t kLength = 25;
 constexpr std::uint64_t kSecond = 1000000;
 constexpr std::uint64_t kMinute = 60 * kSecond;
-constexpr std::uint64_t kDay = 24 * 60 * kMinute;
+constexpr std::uint64_t kDay = std::uint64_t{24} * 60 * kMinute;
 
 bool isDigit(char c) noexcept { return c >= '0' && c <= '9'; }
 
