@@ -14,7 +14,7 @@ namespace zorva::broker {
 
 namespace {
 
-/// Fills one plain value again and again and hands it to the client's sinks.
+/// Fills one plain value again and again and gives it to the client's sinks.
 class SinkTaker : public Taker {
  public:
   SinkTaker(const InstanceSink* instances, const PathSink* paths) : instances_(instances), paths_(paths) {}
@@ -35,7 +35,7 @@ class SinkTaker : public Taker {
   Instance instance_;
 };
 
-/// Takes the one result that there is.
+/// Takes the only result.
 class OneTaker : public Taker {
  public:
   OneTaker(Instance* instance, ObjectPath* path) : instance_(instance), path_(path) {}
@@ -73,7 +73,7 @@ std::optional<std::vector<std::string_view>> viewsOf(const std::optional<std::ve
   return std::vector<std::string_view>(names->begin(), names->end());
 }
 
-/// Of associators and references: there, inheritance is always deep and properties are never local only.
+/// For associators and references: there, inheritance is always deep and properties are never local only.
 Shape listOnly(const Selection& selection) {
   Shape shape;
   shape.properties = viewsOf(selection.propertyList);
@@ -91,15 +91,14 @@ FarEnd farEndOf(const AssociationFilter& filter) noexcept {
   return {filter.associationClass, filter.resultClass, filter.role, filter.resultRole};
 }
 
-/// The path of an operation that has a status of its own for a class that is not there (DSP0200 5.3.2.14 to
-/// .17, 5.4.1).
+/// The path of an operation with a status of its own for a class that does not exist (DSP0200 5.3.2.14 to .17, 5.4.1).
 Status makeSource(Arena& arena, const ObjectPath& path, int unknownClass, PathObject*& object) {
   Status status = makePath(arena, path, true, object);
   if (status.rc == CMPI_RC_ERR_INVALID_CLASS) status.rc = unknownClass;
   return status;
 }
 
-/// Opens a request and runs `operation(Request&)` in it. What it throws is want of memory, or comes from a sink.
+/// Opens a request and runs `operation(Request&)` in it. Throws only std::bad_alloc and what a sink throws.
 template <class Operation>
 Status inRequest(BrokerCore& core, const Caller& caller, CMPIFlags flags, Operation&& operation) {
   try {
@@ -241,7 +240,7 @@ bool isInput(const schema::Parameter& parameter) {
          schema::hasQualifier(parameter.qualifiers, "In");
 }
 
-/// A method of instances is not called on a class, and no required parameter is left out (DSP0200 5.4.1).
+/// An instance method is not called on a class, and no required parameter may be missing (DSP0200 5.4.1).
 Status checkCall(const ObjectPath& path, const PathObject& name, const schema::ClassMethod& method,
                  const std::vector<NamedValue>& input) {
   const std::string& className = name.info->name();
@@ -293,7 +292,7 @@ Status Broker::invokeMethod(const ObjectPath& path, std::string_view method, con
     if (status.ok()) status = refuseControlCharacters(input);
     if (!status.ok()) return status;
     EntryList arguments;
-    // Where there is none, the request itself says so.
+    // If the class has no such method, the request reports it.
     if (const schema::ClassMethod* declared = name->info->declared().findMethod(method)) {
       status = checkCall(path, *name, *declared, input);
       if (status.ok()) status = makeArguments(request.arena(), *declared, input, arguments);

@@ -62,7 +62,7 @@ class BrokerTest : public ::testing::Test {
     return found;
   }
 
-  /// Of the properties that have a value.
+  /// The properties that have a value.
   static std::vector<std::string> propertyNames(const Instance& instance) {
     std::vector<std::string> found;
     for (const Property& property : instance.properties) {
@@ -157,7 +157,7 @@ TEST_F(BrokerTest, APropertyListLeavesOutAlsoWhatHasNoValue) {
 }
 
 TEST_F(BrokerTest, EnumeratesTheServedClassesBelowAnAbstractOne) {
-  // T_Absent is served by a library that does not exist: that costs its own instances alone.
+  // T_Absent is served by a library that does not exist: only its own instances are missing.
   const std::vector<std::string> found = names("T_Base");
   EXPECT_EQ(status_.rc, 0) << status_.message;
   EXPECT_THAT(found, Contains("root/cimv2:T_Other.Name=\"o\""));
@@ -202,7 +202,7 @@ TEST_F(BrokerTest, AnswersNotFoundWhereTheProviderReturnsNothing) {
   EXPECT_THAT(status_.message, HasSubstr("T_Thing.Name=\"z\""));
   get("T_Base.Name=\"a\"");
   EXPECT_EQ(status_.rc, 6);
-  get("T_Trouble.Name=\"other\"");  // an instance of another class is none of this one
+  get("T_Trouble.Name=\"other\"");  // an instance of another class is not returned
   EXPECT_EQ(status_.rc, 6);
 }
 
@@ -423,7 +423,7 @@ TEST_F(BrokerTest, AnUnknownClassHasTheStatusOfItsOperation) {
 
 TEST_F(BrokerTest, AsksEachAssociationThatFitsUnderItsOwnName) {
   EXPECT_THAT(associatorNames("T_Thing.Name=\"a\""), ElementsAre("root/cimv2:T_Other.Name=\"o\""));
-  // The refusing one and the one without a library are passed over.
+  // The refusing one and the one without a library are skipped.
   EXPECT_EQ(status_.rc, 0) << status_.message;
   EXPECT_THAT(lines(), Contains("AssociatorNames root/cimv2:T_Thing.Name T_ThingOther - - -"));
   EXPECT_THAT(lines(), Contains(StartsWith("T_ThingAbsent is left out: there is no provider library")));

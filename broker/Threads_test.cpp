@@ -17,7 +17,7 @@
 #include "broker/requests/Result.h"
 #include "broker/testing/TestClasses.h"
 
-// What the broker offers providers that run threads of their own: CMPIBrokerExtFT, and attaching.
+// CMPIBrokerExtFT and attaching: the broker's functions for providers that run their own threads.
 
 namespace zorva::broker {
 namespace {
@@ -86,7 +86,7 @@ TEST_F(ThreadsTest, AThreadEndsEarly) {
 }
 
 TEST_F(ThreadsTest, AThreadIsCancelled) {
-  // Its frames hold no variables: AddressSanitizer does not learn that a cancelled thread left them.
+  // Has no local variables: AddressSanitizer does not notice that a cancelled thread left this frame.
   void* thread = xft_.newThread(
       [](void*) -> void* {
         for (;;) pause();

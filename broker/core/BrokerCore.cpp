@@ -27,7 +27,7 @@ BrokerCore::~BrokerCore() = default;
 
 BrokerCore* BrokerCore::of(const CMPIBroker* handle) noexcept {
   if (handle == nullptr || handle->hdl == nullptr) return nullptr;
-  // A program may stand between a provider and the broker with some tables of its own, handing on the rest.
+  // Another program layer may replace some of the broker's tables with its own and pass the other calls on.
   const bool ours = handle->bft == &brokerTable || handle->eft == &encapsulationTable || handle->mft == &memoryTable;
   return ours ? static_cast<BrokerCore*>(handle->hdl) : nullptr;
 }

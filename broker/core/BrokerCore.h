@@ -13,7 +13,7 @@
 #include "broker/objects/ClassTable.h"
 #include "cmpift.h"
 
-// What a broker is made of, behind the class that users see and the tables that providers see. Safe on any thread.
+// The inside of a broker: users see the class Broker, providers see the function tables. Safe on any thread.
 
 namespace zorva::broker {
 
@@ -27,7 +27,7 @@ class BrokerCore {
   BrokerCore(const BrokerCore&) = delete;
   BrokerCore& operator=(const BrokerCore&) = delete;
 
-  /// The core behind a broker handle that a provider gives back; null where it is none of ours.
+  /// The core of a broker handle that a provider passes; null if the handle is not one of this program.
   static BrokerCore* of(const CMPIBroker* handle) noexcept;
 
   const CMPIBroker* handle() const noexcept { return &handle_; }
@@ -36,10 +36,10 @@ class BrokerCore {
   ProviderLoader& loader() noexcept { return loader_; }
   BlockCache& blocks() noexcept { return blocks_; }
 
-  /// Hands a line to the log hook. What the hook throws is lost.
+  /// Passes a line to the log hook. Exceptions of the hook are ignored.
   void log(LogLevel level, std::string_view text) const noexcept;
 
-  /// What the claim hook gives; null where there is none. Throws what the hook throws.
+  /// The result of the claim hook; null without a hook. Throws what the hook throws.
   std::unique_ptr<Claim> claim(Access access, std::string_view className, const ObjectPath* changed) const {
     return claim_ ? claim_(access, className, changed) : nullptr;
   }
@@ -50,7 +50,7 @@ class BrokerCore {
 
   /// Opens a scope on this thread until detachThread. False where one is open already.
   bool attachThread();
-  /// Closes it. False where this thread was not attached. `context` is freed where prepareThread made it.
+  /// Closes that scope. False if this thread was not attached. Frees `context` if prepareThread made it.
   bool detachThread(const ContextObject* context);
 
  private:
@@ -62,13 +62,13 @@ class BrokerCore {
   ProviderRegistry registry_;
   LogHook log_;
   ClaimHook claim_;
-  std::mutex threadsMutex_;  // guards the two that follow
+  std::mutex threadsMutex_;  // guards the next two members
   std::vector<std::unique_ptr<Arena>> prepared_;
   std::vector<std::unique_ptr<Attached>> attached_;
-  ProviderLoader loader_;  // last: its end calls providers, which may need all that stands above
+  ProviderLoader loader_;  // last: its destructor calls providers, which may need all members above
 };
 
-/// Where the function tables of a broker stand.
+/// The function tables of every broker.
 extern CMPIBrokerFT brokerTable;
 extern CMPIBrokerEncFT encapsulationTable;
 extern CMPIBrokerExtFT extensionTable;

@@ -27,7 +27,7 @@ struct ProviderLoader::Library {
 
 namespace {
 
-/// The files that a library's name may stand for, best first.
+/// The file names that a library's name may mean, best first.
 std::vector<std::string> candidates(const std::string& directory, const std::string& name) {
   if (name.find('/') != std::string::npos) return {name};
   const std::string stem = (directory.empty() ? "" : directory + "/") + "lib" + name + ".so";
@@ -118,7 +118,7 @@ const Mi* ProviderLoader::find(const ProviderEntry& entry, std::atomic<const Mi*
 }
 
 void ProviderLoader::makeAll(Provider& provider, MiKind wanted, Status& status) {
-  Status unheeded;  // a kind that cannot be made is told to who asks for it
+  Status unheeded;  // a kind that cannot be made is reported to the request that needs it
   const auto wants = [&](MiKind kind, bool made) { return (provider.kinds & kind) != 0 && !made; };
   const auto statusOf = [&](MiKind kind) -> Status& { return kind == wanted ? status : unheeded; };
   const CMPIInstanceMI* instance = provider.instance.load();
@@ -194,7 +194,7 @@ std::vector<std::string> ProviderLoader::openAll() {
   const std::lock_guard lock(mutex_);
   std::set<std::string> names;
   for (const auto& provider : providers_) names.insert(provider->library);
-  names.erase("");  // providers that are part of the program
+  names.erase("");  // providers that are linked into the program
   std::vector<std::string> problems;
   for (const std::string& name : names) {
     Status status;

@@ -14,9 +14,9 @@
 #include "cmpidt.h"
 #include "cmpift.h"
 
-// Loads provider libraries when the first request needs them, and makes each provider's MIs once, all kinds of one
-// provider together: its create functions store the broker where its operations read it, without a lock, and so none
-// may run once another's MI is in use. Safe on any thread.
+// Loads a provider library when the first request needs it. All MIs of a provider are made once and together: its
+// create functions store the broker where its operations read it without a lock, so no create function may run once
+// another MI is in use. Safe on any thread.
 
 namespace zorva::broker {
 
@@ -36,23 +36,24 @@ class ProviderLoader {
   ProviderLoader(LoaderHost host, const ProviderRegistry& registry, std::string directory,
                  std::vector<LinkedFunction> linked);
 
-  /// Calls the cleanup of every MI that was made, then closes the libraries, save those that ask to stay.
+  /// Calls the cleanup of every MI that was made, then closes the libraries, except those that ask to stay loaded.
   ~ProviderLoader();
   ProviderLoader(const ProviderLoader&) = delete;
   ProviderLoader& operator=(const ProviderLoader&) = delete;
 
-  /// The MI of an entry of the registry; null with a failure that says what is missing. A failure is not remembered:
-  /// the next request tries again.
+  /// The MI for a registry entry; null on a failure, which says what is missing. A failure is not remembered: the next
+  /// request tries again.
   const CMPIInstanceMI* instanceMi(const ProviderEntry& entry, Status& status);
   const CMPIAssociationMI* associationMi(const ProviderEntry& entry, Status& status);
   const CMPIMethodMI* methodMi(const ProviderEntry& entry, Status& status);
 
-  /// Opens every library that the registry names, and says of each one that cannot be opened why.
+  /// Opens every library that the registry names. Returns a sentence with the reason for each one that cannot be
+  /// opened.
   std::vector<std::string> openAll();
 
  private:
   struct Library;
-  /// One prefix in one library; several entries of the registry may share it.
+  /// One prefix in one library; several registry entries may share it.
   struct Provider {
     std::string prefix;
     std::string library;
@@ -66,9 +67,9 @@ class ProviderLoader {
 
   Provider& providerOf(const ProviderEntry& entry) const;
   Library* open(const std::string& name, Status& status);
-  /// A create function, in the program itself for a provider without library. Null with a failure.
+  /// A create function, from the program itself for a provider without library. Null on a failure.
   void* findFunction(const Provider& provider, const std::string& function, Status& status);
-  /// Makes what the provider lacks of its kinds and publishes it. `status` is that of the kind `wanted`.
+  /// Makes the provider's missing kinds and publishes it. `status` is that of the kind `wanted`.
   void makeAll(Provider& provider, MiKind wanted, Status& status);
   template <class Mi>
   const Mi* make(const Provider& provider, const char* kind, Status& status);

@@ -15,8 +15,8 @@ namespace {
 constexpr const char* kProfileLibrary = "zorvadnsclientprofileprovider";
 constexpr const char* kHostLibrary = "zorvahostprofileprovider";
 
-// The spelling of prefix and class differs in places ("EndPoint" beside "Endpoint"); each is what the library exports
-// and the schema has.
+// Prefix and class differ in spelling in places ("EndPoint" and "Endpoint"): the prefix is what the library exports,
+// the class is what the schema has.
 struct BuiltIn {
   const char* className;
   const char* prefix;
@@ -47,8 +47,8 @@ constexpr BuiltIn kBuiltIn[] = {
     {"ZORVA_IPAssignmentSettingData", "HostIPAssignmentSettingDataProvider", kHostLibrary, InstanceMi},
 };
 
-/// ProviderEntry::keeps of the classes that can be modified. Of the setting data's providers, one empties a
-/// ConfigurationName that is missing, the other logs an error.
+/// ProviderEntry::keeps of the modifiable classes. Of the two setting-data providers, one empties a missing
+/// ConfigurationName, the other logs an error.
 std::vector<std::string> keptBy(std::string_view className) {
   if (className == "ZORVA_DNSProtocolEndPoint") return {"DNSSuffixesToAppend", "DomainName", "Hostname"};
   if (className == "ZORVA_DNSSettingData") return {"RequestedHostname", "DomainName", "DNSServerAddresses"};

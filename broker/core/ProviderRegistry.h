@@ -15,16 +15,16 @@ enum MiKind : unsigned {
   MethodMi = 4,
 };
 
-/// One class and who serves it.
+/// One class and the provider that serves it.
 struct ProviderEntry {
   std::string className;
   std::string prefix;  ///< the create functions are <prefix>_Create_InstanceMI, _AssociationMI, _MethodMI
-  /// "x" stands for libx.so.1, or else libx.so, in the provider directory; or a path with "/"; or empty: the program
+  /// "x" means libx.so.1, or else libx.so, in the provider directory; a text with "/" is a path; empty: the program
   std::string library;
   unsigned kinds = 0;  ///< MiKind bits
   std::string nameSpace = "root/cimv2";
-  /// The properties that the provider leaves as they are where a modification lacks them. All others may be lost then,
-  /// so it is handed their current values.
+  /// The properties that the provider leaves unchanged if a modification lacks them. All other properties could be lost
+  /// then, so the provider gets their current values.
   std::vector<std::string> keeps = {};
 };
 
@@ -33,24 +33,24 @@ class ProviderRegistry {
   /// The twelve classes of the DNS client profile and the four companions.
   static ProviderRegistry builtIn();
 
-  /// The directory with the libraries of builtIn(): beside the running program, as built or as installed. Empty where
-  /// they are not there, which leaves it to the dynamic loader.
+  /// The directory with the libraries of builtIn(): beside the running program, as built or as installed. Empty if they
+  /// are not there; then the dynamic loader searches.
   static std::string builtInDirectory();
 
-  /// Adds an entry; one for a class and namespace that is there already takes its place.
+  /// Adds an entry; it replaces an existing one for the same class and namespace.
   void add(ProviderEntry entry);
 
-  /// The entry of a class, name and namespace in any case; null where nobody serves it.
+  /// The entry of a class, name and namespace in any case; null if no provider serves the class.
   const ProviderEntry* find(std::string_view nameSpace, std::string_view className) const noexcept;
 
-  /// A namespace in the registry's spelling, found without regard to case and to slashes at either end. Empty where the
-  /// registry knows no such namespace.
+  /// A namespace in the registry's spelling. Case and slashes at either end do not matter. Empty if the registry has no
+  /// such namespace.
   std::string_view nameSpace(std::string_view spelling) const noexcept;
 
-  /// The namespace that an omitted one stands for: that of the first entry, or "root/cimv2".
+  /// The namespace of requests that name none: that of the first entry, or "root/cimv2".
   std::string_view defaultNameSpace() const noexcept;
 
-  /// Makes a namespace known although no entry has it.
+  /// Adds a namespace that no entry has.
   void addNameSpace(std::string nameSpace);
 
   /// In the order in which they were added.

@@ -30,11 +30,11 @@ char* Arena::addBlock(std::size_t size) {
 
 void* Arena::takeFromNewBlock(std::size_t size) {
   if (size > kMost) throw std::bad_alloc();
-  // What is large gets a block of its own, so that the room left in the present one is not lost.
+  // A large object gets its own block, so that the room left in the present one is not lost.
   if (size > next_ / 2) return addBlock(size);
   position_ = addBlock(next_);
   end_ = position_ + next_;
-  // Small requests stay small; from then on blocks are of the size that the cache keeps.
+  // Small requests stay small. Later blocks have the size that the cache keeps.
   next_ = next_ * 4 < BlockCache::kBlock ? next_ * 4 : BlockCache::kBlock;
   return take(size);
 }

@@ -7,10 +7,11 @@
 #include <type_traits>
 #include <utility>
 
-// The memory of one request: it is handed out by moving a pointer and given back all at once, with the arena. What
-// lives in it has no destructor.
+// The memory of one request. Allocation moves a pointer; all memory is freed at once, with the arena. Objects in it
+// have no destructor.
 //
-// An arena belongs to one thread at a time. share() makes allocation safe for several, at the cost of a lock each time.
+// An arena belongs to one thread at a time. share() makes allocation safe for several threads, at the cost of a lock
+// each time.
 
 namespace zorva::broker {
 
@@ -20,7 +21,7 @@ class ClassTable;
 struct MemoryBlock;
 struct StringObject;
 
-/// The last few classes and texts that were asked for: an operation makes many objects of few classes, and namespaces,
+/// The last few classes and texts that were looked up: an operation makes many objects of few classes, and namespaces,
 /// hosts and names repeat.
 struct RecentNames {
   static constexpr unsigned kRemembered = 4;
@@ -32,9 +33,9 @@ struct RecentNames {
 
 class Arena {
  public:
-  /// `classes` is what objects in this arena ask about their class; it outlives the arena. Null only where neither a
-  /// path nor an instance will live here. The first block of memory has `firstBlock` bytes, later ones are larger;
-  /// `cache`, where there is one, gives and takes the largest.
+  /// Objects in this arena look up their class in `classes`, which outlives the arena. It may be null if the arena will
+  /// hold neither a path nor an instance. The first block of memory has `firstBlock` bytes, later ones are larger. The
+  /// largest blocks come from `cache` and go back to it, if there is one.
   explicit Arena(const ClassTable* classes, std::size_t firstBlock = 4096, BlockCache* cache = nullptr)
       : classes_(classes), cache_(cache), next_(firstBlock) {}
   ~Arena();
@@ -66,16 +67,16 @@ class Arena {
   /// A copy of `text`, ended by a NUL.
   const char* text(std::string_view text);
 
-  /// From here on several threads may allocate. Call it before the second thread learns of the arena.
+  /// From now on several threads may allocate. Call it before the second thread can use the arena.
   void share() noexcept { shared_ = true; }
   bool isShared() const noexcept { return shared_; }
 
-  /// An arena made by clone() holds one object and what belongs to it, and is deleted by that object's release(). Null
-  /// for the arena of a request.
+  /// An arena made by clone() holds one object and its parts, and is deleted by that object's release(). Null for the
+  /// arena of a request.
   const void* root() const noexcept { return root_; }
   void setRoot(const void* root) noexcept { root_ = root; }
 
-  /// What findClass() and intern() remember in this arena.
+  /// What findClass() and intern() remember for this arena.
   RecentNames& recent() noexcept { return recent_; }
 
   /// Bytes of memory held.
@@ -83,7 +84,7 @@ class Arena {
 
  private:
   static constexpr std::size_t kAlignment = 8;
-  // No object of a request is larger: what asks for more is mistaken.
+  // No object of a request is larger: a larger size is an error of the caller.
   static constexpr std::size_t kMost = static_cast<std::size_t>(1) << 30;
 
   void* take(std::size_t size) {

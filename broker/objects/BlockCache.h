@@ -3,22 +3,22 @@
 #include <cstddef>
 #include <mutex>
 
-// Memory blocks that arenas gave back, kept for the next request: memory that was touched already costs no page faults.
+// Memory blocks that arenas gave back, kept for the next request: memory that was used before costs no page faults.
 // Safe on any thread.
 
 namespace zorva::broker {
 
-/// The head of a block; what is handed out follows it.
+/// The head of a block; the usable memory follows it.
 struct MemoryBlock {
   MemoryBlock* previous;
-  std::size_t size;  ///< of what follows
+  std::size_t size;  ///< of the memory after the head
 };
 
 class BlockCache {
  public:
   /// The size of the blocks that are kept.
   static constexpr std::size_t kBlock = std::size_t{256} * 1024 - sizeof(MemoryBlock);
-  /// How many are kept. A server that has rested holds no more than this.
+  /// How many are kept: an idle server holds no more than this.
   static constexpr std::size_t kMostBlocks = 16;
 
   BlockCache() = default;
@@ -28,7 +28,7 @@ class BlockCache {
 
   /// A block of kBlock bytes, or null where none is kept.
   MemoryBlock* take() noexcept;
-  /// True where the block is kept; else it is still the caller's.
+  /// True if the block is kept; else the caller still owns it.
   bool keep(MemoryBlock* block) noexcept;
 
  private:

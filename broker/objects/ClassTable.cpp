@@ -6,9 +6,9 @@ namespace zorva::broker {
 
 namespace {
 
-// Of the length and a few characters: enough to tell the names of one class apart nearly always, for a look-up that is
-// made for each property that a provider sets. Names that differ in nothing else share a bucket, no more. The bit that
-// sets small letters apart from capitals is left out.
+// Hashes the length and a few characters. That tells nearly all names of one class apart, and is cheap: a look-up is
+// made for each property that a provider sets. Other names share a bucket. The bit that makes the difference between
+// small letters and capitals is left out.
 std::size_t bucketOf(std::string_view name, std::size_t mask) noexcept {
   constexpr std::uint32_t kSmallLetters = 0x20202020;
   if (name.empty()) return 0;
@@ -80,7 +80,7 @@ const ClassInfo* ClassTable::find(std::string_view name) const {
   if (declared == nullptr) return nullptr;
   auto made = std::make_unique<ClassInfo>(*declared);
   const std::unique_lock lock(mutex_);
-  // Where another thread was faster, its object stays: pointers to it are out.
+  // If another thread was faster, its object stays: callers hold pointers to it.
   return classes_.try_emplace(declared->name(), std::move(made)).first->second.get();
 }
 

@@ -12,12 +12,12 @@
 #include "broker/objects/Objects.h"
 #include "schema/ClassRepository.h"
 
-// The schema as the broker's objects need it: the names as CMPI texts, the types as CMPI types, and look-ups that cost
-// next to nothing. Made class by class when one is first asked for.
+// The schema as the broker's objects need it: names as CMPI texts, types as CMPI types, and fast look-ups. A class is
+// converted at its first look-up.
 
 namespace zorva::broker {
 
-/// A class as the broker's objects see it. Immutable, but for what it remembers of its use.
+/// A class as the broker's objects see it. Immutable, except for statistics of its use.
 class ClassInfo {
  public:
   explicit ClassInfo(const schema::Class& declared);
@@ -30,20 +30,20 @@ class ClassInfo {
   const std::vector<PropertyInfo>& properties() const noexcept { return properties_; }
   const std::vector<const PropertyInfo*>& keys() const noexcept { return keys_; }
 
-  /// Null where the class has no such property; the name in any case.
+  /// Null if the class has no such property; the name in any case.
   const PropertyInfo* find(std::string_view name) const noexcept;
 
-  /// The same, faster where `name` is the property that came after `previous` the last time: a provider sets the
-  /// properties of all its instances in one order. Null is before the first.
+  /// The same, faster if `name` is the property that followed `previous` the last time: a provider sets the properties
+  /// of all its instances in one order. A null `previous` is the position before the first.
   const PropertyInfo* findAfter(const PropertyInfo* previous, const char* name) const noexcept;
 
-  /// The same, faster where `name` is the class's key of that number.
+  /// The same, faster if `name` is the class's key with that number.
   const PropertyInfo* findKey(std::size_t number, std::string_view name) const noexcept {
     const bool isUsual = number < keys_.size() && keys_[number]->name->view() == name;
     return isUsual ? keys_[number] : find(name);
   }
 
-  /// How many properties the fullest instance so far had: room for as many is taken at once.
+  /// How many properties the fullest instance so far had: a new instance reserves that much room.
   std::uint32_t usualSize() const noexcept { return usualSize_.load(std::memory_order_relaxed); }
   void noteSize(std::uint32_t size) const noexcept {
     if (size > usualSize()) usualSize_.store(size, std::memory_order_relaxed);
@@ -54,7 +54,7 @@ class ClassInfo {
  private:
   const schema::Class& declared_;
   StringObject nameObject_;
-  std::deque<StringObject> names_;  // they stay where they are made: others point at them
+  std::deque<StringObject> names_;  // a deque: other objects point at the elements
   std::vector<PropertyInfo> properties_;
   std::vector<const PropertyInfo*> keys_;
   // Open addressing: index + 1 of the property whose name hashes here, 0 for none. At most half full.
@@ -71,7 +71,7 @@ class ClassTable {
 
   const schema::ClassRepository& repository() const noexcept { return *repository_; }
 
-  /// Null where the schema has no such class; the name in any case. What is given lives as long as the table.
+  /// Null if the schema has no such class; the name in any case. The result lives as long as the table.
   const ClassInfo* find(std::string_view name) const;
   const ClassInfo& of(const schema::Class& declared) const { return *find(declared.name()); }
 
@@ -82,7 +82,7 @@ class ClassTable {
       classes_;
 };
 
-/// The class of that name in the class table of `arena`, or null. Classes that were asked for last are found at once.
+/// The class of that name in the class table of `arena`, or null. Recently used classes are found fastest.
 const ClassInfo* findClass(Arena& arena, std::string_view name);
 
 /// The CMPI type of a schema's type.

@@ -11,7 +11,7 @@ namespace zorva::broker {
 
 namespace {
 
-// How deep references and embedded instances may lie within one another.
+// How deep references and embedded instances may be nested.
 constexpr int kDeepest = 16;
 
 void assignText(Scalar& scalar, std::string_view text) {
@@ -143,7 +143,8 @@ void fillInstancePath(const InstanceObject& object, ObjectPath& path) {
 
 namespace {
 
-/// Makes the property at `place` null. The same property often was there in the instance before: then that is all.
+/// Makes the property at `place` null. Often the same property was there in the instance before; then nothing else
+/// changes.
 void fillNull(const PropertyInfo& property, std::size_t place, Instance& instance) {
   if (place == instance.properties.size()) instance.properties.emplace_back();
   Property& filled = instance.properties[place];
@@ -275,7 +276,7 @@ class ScalarMaker {
 
   Status makeReference(const ObjectPath& path, PathObject*& object);
 
-  /// A text that stands for a reference.
+  /// A text given for a reference.
   std::string reference(const std::string& text) {
     ObjectPath path;
     if (const auto error = parsePathText(text, path)) {
@@ -284,7 +285,7 @@ class ScalarMaker {
     return (*this)(Boxed<ObjectPath>(std::move(path)));
   }
 
-  /// A text that stands for a number, a boolean or a character.
+  /// A text given for a number, a boolean or a character.
   std::string untyped(const std::string& text) {
     if (data_.type == CMPI_boolean) {
       if (schema::sameName(text, "true") || schema::sameName(text, "false"))
@@ -329,7 +330,7 @@ class Nesting {
 };
 
 Status ScalarMaker::makeReference(const ObjectPath& path, PathObject*& object) {
-  // What a reference points at need not be a class of this schema, and is not checked.
+  // The target of a reference may have a class that this schema lacks, so the class is not checked.
   return makePath(arena_, path, false, object);
 }
 
@@ -378,7 +379,7 @@ Status addKnownKeys(Arena& arena, const ObjectPath& path, PathObject& object) {
       return {CMPI_RC_ERR_INVALID_PARAMETER, object.info->name() + " has no key " + key.name};
     }
   }
-  // Clients order keys as they like; providers see the schema's order.
+  // Clients may order keys in any way; providers see the schema's order.
   object.keys.reserve(arena, static_cast<std::uint32_t>(path.keys.size()));
   for (const PropertyInfo& property : object.info->properties()) {
     const Value* value = path.key(property.declared->name);

@@ -6,14 +6,14 @@
 #include "broker/objects/Objects.h"
 #include "broker/objects/Value.h"
 
-// Between the plain values that clients use and the CMPI objects that providers use.
+// Converts between the plain values of clients and the CMPI objects of providers.
 //
-// The functions that fill a plain value reuse what it holds already: filling the same one again and again allocates
-// next to nothing.
+// The functions that fill a plain value reuse its memory: filling the same value again and again allocates almost
+// nothing.
 
 namespace zorva::broker {
 
-/// Which properties of a class are wanted, by PropertyInfo::index. Without bits: all.
+/// Which properties of a class are requested, by PropertyInfo::index. Without bits: all.
 struct PropertyMask {
   const std::uint64_t* bits = nullptr;
 
@@ -23,8 +23,8 @@ struct PropertyMask {
 };
 
 void fillPath(const PathObject& object, ObjectPath& path);
-/// The properties that are set, in the order in which they were set, then all others of the class without value: the
-/// defaults of the schema are no facts of the host.
+/// The properties that are set, in the order in which they were set, then all others of the class without value. The
+/// schema's defaults are not used, because they are not facts about the host.
 void fillInstance(const InstanceObject& object, const PropertyMask& wanted, Instance& instance);
 void fillValue(const CMPIData& data, Value& value);
 
@@ -37,17 +37,17 @@ struct DeclaredType {
 DeclaredType declaredType(const PropertyInfo& property) noexcept;
 DeclaredType declaredType(const schema::Parameter& parameter) noexcept;
 
-/// Makes data of the declared type, in `arena`. A text stands for a number, a boolean or a reference where one is
-/// declared. `what` names the place in the message of a failure, which is CMPI_RC_ERR_TYPE_MISMATCH.
+/// Makes data of the declared type, in `arena`. If a number, a boolean or a reference is declared, a text is converted.
+/// On a failure, CMPI_RC_ERR_TYPE_MISMATCH, the message names the place `what`.
 Status makeData(Arena& arena, const DeclaredType& declared, const Value& value, std::string_view what, CMPIData& data);
 
-/// Data of the type that the value says itself, for what the schema does not know.
+/// Data of the value's own type, for properties and parameters that the schema does not know.
 Status makeData(Arena& arena, const Value& value, std::string_view what, CMPIData& data);
 
-/// Makes a path whose names are in the schema's spelling and whose keys have the schema's types and order. A class that
-/// the schema lacks is CMPI_RC_ERR_INVALID_CLASS where `classMustExist`, else its keys are taken as they are. A key
-/// that the class lacks, or whose value does not fit, is CMPI_RC_ERR_INVALID_PARAMETER. The namespace is taken as it
-/// is.
+/// Makes a path whose names are in the schema's spelling and whose keys have the schema's types and order. If the
+/// schema lacks the class, the result is CMPI_RC_ERR_INVALID_CLASS where `classMustExist`; otherwise the keys are taken
+/// unchanged. A key that the class lacks, or whose value does not fit, is CMPI_RC_ERR_INVALID_PARAMETER. The namespace
+/// is taken unchanged.
 Status makePath(Arena& arena, const ObjectPath& path, bool classMustExist, PathObject*& object);
 
 /// Makes an instance with the properties of `instance` and the keys of its path.

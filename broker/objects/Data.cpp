@@ -9,7 +9,7 @@ namespace zorva::broker {
 
 namespace {
 
-/// How deep objects of another broker may lie within one another before they count as unreadable.
+/// How deep objects of another broker may be nested. Deeper ones count as unreadable.
 constexpr int kDeepest = 16;
 
 thread_local int adoptionDepth = 0;
@@ -23,7 +23,7 @@ class AdoptionLevel {
   bool tooDeep() const noexcept { return adoptionDepth > kDeepest; }
 };
 
-/// Bytes of a simple type; 0 for one that is none.
+/// Bytes of a simple type; 0 for any other type.
 std::size_t simpleSize(CMPIType type) noexcept {
   switch (type) {
     case CMPI_boolean:
@@ -55,7 +55,8 @@ CMPIrc importText(Arena& arena, const char* text, CMPIData& data) {
   return CMPI_RC_OK;
 }
 
-/// Puts `object`, made from `handle`, into `data`: no handle is no value, and no object behind a handle an error.
+/// Puts `object`, made from `handle`, into `data`. A null handle gives no value; a handle without an object is an
+/// error.
 template <class Handle, class Object>
 CMPIrc place(const Handle* handle, Object* object, Handle* CMPIValue::*member, CMPIData& data) noexcept {
   if (handle == nullptr) return CMPI_RC_OK;
@@ -75,12 +76,12 @@ CMPIrc importArray(Arena& arena, const CMPIArray* handle, CMPIType type, CMPIDat
   return CMPI_RC_OK;
 }
 
-/// Another broker's data as ours, in `arena`. Data that cannot be kept become no value.
+/// Another broker's data as ours, in `arena`. Data that cannot be kept get no value.
 CMPIData adoptData(Arena& arena, const CMPIData& foreign) {
   const CMPIType type = keptType(foreign.type);
   if ((foreign.state & (CMPI_nullValue | CMPI_notFound | CMPI_badValue)) != 0) return nullData(type);
   CMPIData data = nullData(type);
-  // A C string among another's data is in the value's member, never the value's address.
+  // In data of another broker, a C string is the member of the value, never the value's address.
   const CMPIType given = foreign.type == CMPI_chars ? CMPIType{CMPI_charsptr} : foreign.type;
   if (importData(arena, &foreign.value, given, data) != CMPI_RC_OK) return nullData(type);
   return data;
@@ -98,8 +99,8 @@ CMPIType keptType(CMPIType type) noexcept {
 
 CMPIrc importData(Arena& arena, const CMPIValue* value, CMPIType type, CMPIData& data) {
   const CMPIType kept = keptType(type);
-  // Field by field: a whole copy of what was composed in narrow pieces a moment ago makes the processor wait, and this
-  // is done for each property that a provider sets.
+  // Field by field: copying a whole struct right after its fields were written one by one makes the processor wait, and
+  // this runs for each property that a provider sets.
   data.type = kept;
   data.state = CMPI_nullValue;
   data.value.uint64 = 0;
@@ -121,7 +122,7 @@ CMPIrc importData(Arena& arena, const CMPIValue* value, CMPIType type, CMPIData&
     case CMPI_instance:
       return place(value->inst, adoptInstance(arena, value->inst), &CMPIValue::inst, data);
     default:
-      // Often the address of a variable of just this type, not of a whole CMPIValue.
+      // `value` often points to a variable of exactly this type, not to a whole CMPIValue.
       data.state = CMPI_goodValue;
       std::memcpy(&data.value, value, simpleSize(type));
       return CMPI_RC_OK;
@@ -207,13 +208,13 @@ void copyEntries(Arena& arena, const EntryList& from, EntryList& to) {
 
 namespace {
 
-/// True for data that nobody can change behind the back of what holds them: no object, or a text or date-time.
+/// True for data that no other owner can change: without objects, or a text or date-time.
 bool isUnchanging(const EntryList::Entry& entry) noexcept {
   const CMPIType type = entry.data.type;
   return type != CMPI_ref && type != CMPI_instance && (type & CMPI_ARRAY) == 0;
 }
 
-/// Namespaces and hosts are the same in most objects: one text in the new arena serves them all.
+/// Namespaces and hosts are the same in most objects: all share one text in the new arena.
 StringObject* copyName(Arena& arena, const StringObject& name) {
   if (name.arena == nullptr || name.arena == &arena) return const_cast<StringObject*>(&name);
   return intern(arena, name.view());

@@ -15,7 +15,7 @@ constexpr std::uint64_t kDay = std::uint64_t{24} * 60 * kMinute;
 
 bool isDigit(char c) noexcept { return c >= '0' && c <= '9'; }
 
-/// Reads fields from left to right. A field is digits or asterisks; once there was an asterisk all that follow must be.
+/// Reads fields from left to right. A field is digits or asterisks; after an asterisk all fields must be asterisks.
 class Fields {
  public:
   explicit Fields(std::string_view text) : text_(text) {}
@@ -100,7 +100,7 @@ std::optional<DateTimeValue> parsePoint(std::string_view text) {
   if (!date.good() || !fraction.good() || !zone.good() || !calendar.ok()) return std::nullopt;
   const std::int64_t days = std::chrono::sys_days(calendar).time_since_epoch().count();
   const std::int64_t minutes = (days * 24 + static_cast<std::int64_t>(hour)) * 60 + static_cast<std::int64_t>(minute);
-  // The offset is that of local time: UTC is earlier east of Greenwich.
+  // The offset is that of local time: east of Greenwich UTC is earlier.
   if (minutes < offset) return std::nullopt;
   return DateTimeValue{static_cast<std::uint64_t>(minutes - offset) * kMinute + second * kSecond + micro, false};
 }

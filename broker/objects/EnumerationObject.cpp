@@ -34,7 +34,7 @@ CMPIBoolean hasNext(const CMPIEnumeration* handle, CMPIStatus* status) {
   return self->position < self->count ? 1 : 0;
 }
 
-// All elements, those that getNext gave already included; the enumeration stays as it is.
+// All elements, including those that getNext returned; the enumeration does not change.
 CMPIArray* toArray(const CMPIEnumeration* handle, CMPIStatus* status) {
   const EnumerationObject* self = own<EnumerationObject>(handle);
   if (self == nullptr) return badHandle<CMPIArray*>(status);

@@ -23,7 +23,7 @@ ErrorObject* copyError(Arena& arena, const ErrorObject& error) {
   return copy;
 }
 
-// The getters and setters differ in the member alone.
+// The getters and setters differ only in the member.
 
 template <auto member>
 auto getCode(const CMPIError* handle, CMPIStatus* status) {

@@ -13,7 +13,7 @@
 #include "broker/requests/Result.h"
 #include "broker/testing/TestClasses.h"
 
-// Objects of another broker in the process: ours takes them through their own tables.
+// Objects of another broker in the process: our broker reads them through their own tables.
 
 namespace zorva::broker {
 namespace {
@@ -113,7 +113,7 @@ TEST_F(ForeignTest, ForeignHandlesAreNotOursToWorkOn) {
   EXPECT_EQ(status_.rc, CMPI_RC_ERR_INVALID_HANDLE);
   EXPECT_EQ(textOf(cmpi_->eft->toString(cmpi_, path, &status_)), "");
   EXPECT_EQ(status_.rc, CMPI_RC_ERR_INVALID_HANDLE);
-  cmpi_->mft->freeObjectPath(cmpi_, path);  // goes to the path's own release
+  cmpi_->mft->freeObjectPath(cmpi_, path);  // calls the path's own release
   EXPECT_EQ(foreign_.calls().count("release"), 1U);
 }
 

@@ -52,7 +52,7 @@ CMPIStatus setProperty(const CMPIInstance* handle, const char* name, const CMPIV
     return statusOf(CMPI_RC_ERR_NO_SUCH_PROPERTY,
                     self->info->name() + " has no property " + (name != nullptr ? name : "without a name"));
   }
-  // What the filter keeps out is left out in silence: the provider need not know what was asked for.
+  // Properties that the filter excludes are dropped without an error: the provider need not know what was requested.
   if (!self->passes(*property)) return {CMPI_RC_OK, nullptr};
   CMPIData data;
   const CMPIrc rc = importData(*self->arena, value, type, data);
@@ -114,7 +114,7 @@ CMPIStatus setObjectPath(CMPIInstance* handle, const CMPIObjectPath* path) {
   return {CMPI_RC_OK, nullptr};
 }
 
-// Where a property comes from is the schema's to say.
+// The origin of a property comes from the schema.
 CMPIStatus setPropertyWithOrigin(const CMPIInstance* handle, const char* name, const CMPIValue* value,
                                  const CMPIType type, const char* /*origin*/) {
   return setProperty(handle, name, value, type);

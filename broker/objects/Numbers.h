@@ -51,7 +51,7 @@ bool placeNumber(Narrow& member, Wide number) noexcept {
   return static_cast<Wide>(member) == number;
 }
 
-/// Puts a number into `data` by its type, which is an unsigned one. False where it does not fit.
+/// Puts a number into `data` by its type, which is an unsigned one. False if it does not fit.
 inline bool placeUnsigned(CMPIData& data, std::uint64_t number) noexcept {
   switch (data.type) {
     case CMPI_uint8:
@@ -83,7 +83,7 @@ inline bool placeSigned(CMPIData& data, std::int64_t number) noexcept {
   }
 }
 
-/// The same for the real types; a 32-bit one is rounded, and refuses what is out of its range.
+/// The same for the real types. A number for a 32-bit one is rounded, and refused if it is out of range.
 inline bool placeReal(CMPIData& data, double number) noexcept {
   if (data.type == CMPI_real64) {
     data.value.real64 = number;

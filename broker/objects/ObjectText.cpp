@@ -44,7 +44,7 @@ std::string realText(double number) {
   return std::string(text, std::to_chars(text, text + sizeof text, number).ptr);
 }
 
-/// As MOF has it; what is no printable ASCII character by its number.
+/// As in MOF; a character that is not printable ASCII is written as its number.
 std::string characterText(CMPIChar16 code) {
   if (code >= 0x20 && code < 0x7F && code != '\'' && code != '\\') return {'\'', static_cast<char>(code), '\''};
   char text[16];

@@ -4,18 +4,18 @@
 
 #include "broker/objects/Objects.h"
 
-// CMPI objects as text for people: what toString gives.
+// CMPI objects as text for people: the result of toString.
 
 namespace zorva::broker {
 
 /// A path in the form of PathText.h.
 std::string objectText(const PathObject& path);
 
-/// Any object of this broker: an instance in the form of MOF, a text as it stands, an array in braces. Empty where
-/// `object` is none of this broker's.
+/// Any object of this broker: an instance in the form of MOF, a text unchanged, an array in braces. Empty if `object`
+/// belongs to another broker.
 std::string objectText(const void* object);
 
-/// A value as MOF has it: `"a"`, `{1, 2}`, `NULL`.
+/// A value as in MOF: `"a"`, `{1, 2}`, `NULL`.
 std::string dataText(const CMPIData& data);
 
 }  // namespace zorva::broker

@@ -10,12 +10,12 @@
 #include "cmpimacs.h"
 
 // The CMPI objects of this broker. Each begins with the handle that CMPI publishes (hdl, ft), hdl pointing at the
-// object itself, so that a handle of ours is told by its function table: own<InstanceObject>(handle) is the object
-// behind it, or null where the handle is null, of another kind, or another broker's.
+// object itself. A handle of ours is recognized by its function table: own<InstanceObject>(handle) is the object of the
+// handle, or null if the handle is null, of another kind, or another broker's.
 //
-// Objects live in an arena and have no destructor. Texts and date-times never change once made, so objects of one arena
-// share them; all others are copied when they become part of another. An arena pointer of null marks an object that
-// lives as long as the broker.
+// Objects live in an arena and have no destructor. Texts and date-times are immutable, so objects of one arena share
+// them. All others are copied when they become part of another object. A null arena pointer marks an object that lives
+// as long as the broker.
 
 namespace zorva::schema {
 struct ClassProperty;
@@ -43,13 +43,13 @@ struct StringObject : CMPIString {
   std::size_t length;
 };
 
-/// The empty text, for what is not set.
+/// The empty text, for a text that is not set.
 StringObject& emptyString() noexcept;
 
-/// A text object with that content, an earlier one where it is among the last few that were asked for.
+/// A text object with that content. Reuses one of the last few if it has the same content.
 StringObject* intern(Arena& arena, std::string_view text);
 
-/// A property as a class has it.
+/// A property as declared in a class.
 struct PropertyInfo {
   const schema::ClassProperty* declared;
   StringObject* name;   ///< lives as long as the table
@@ -68,7 +68,7 @@ struct ArrayObject : CMPIArray {
   ArrayObject& operator=(const ArrayObject&) = delete;
 
   Arena* arena;
-  CMPIType type;  ///< of the elements; CMPI_string also where it was made for CMPI_chars
+  CMPIType type;  ///< of the elements; CMPI_string also if it was made for CMPI_chars
   CMPICount count;
   CMPIData* elements;
 };
@@ -87,7 +87,7 @@ struct DateTimeObject : CMPIDateTime {
   DateTimeObject(const DateTimeObject&) = delete;
   DateTimeObject& operator=(const DateTimeObject&) = delete;
 
-  /// Null where `text` is no date-time.
+  /// Null if `text` is no date-time.
   static DateTimeObject* make(Arena& arena, std::string_view text);
 
   Arena* arena;
@@ -96,7 +96,7 @@ struct DateTimeObject : CMPIDateTime {
   bool interval;
 };
 
-/// Named data in the order in which they came: keys, arguments, context entries.
+/// Named data in the order of insertion: keys, arguments, context entries.
 class EntryList {
  public:
   struct Entry {
@@ -105,8 +105,8 @@ class EntryList {
   };
 
   const Entry* find(std::string_view name) const noexcept;
-  /// Takes over the entries of a list of the same arena without copying them; whichever list is changed first gets
-  /// entries of its own.
+  /// Shares the entries of a list of the same arena without copying them. The list that is changed first gets its own
+  /// copy.
   void share(const EntryList& other) noexcept;
   /// Sets the entry of that name, or appends one.
   void set(Arena& arena, StringObject* name, const CMPIData& data);
@@ -119,7 +119,7 @@ class EntryList {
   const Entry* end() const noexcept { return entries_ + size_; }
 
  private:
-  /// Gives the list an array of its own.
+  /// Gives the list its own array.
   void moveTo(Arena& arena, std::uint32_t capacity);
 
   Entry* entries_ = nullptr;
@@ -143,14 +143,14 @@ struct PathObject : CMPIObjectPath {
 
   static PathObject* make(Arena& arena, std::string_view nameSpace, std::string_view className);
 
-  /// Takes the schema's spelling where the schema has the class.
+  /// Takes the schema's spelling if the schema has the class.
   void setClass(std::string_view name);
   void setClass(const ClassInfo& known) noexcept;
   void setNameSpace(std::string_view name);
   void setHost(std::string_view name);
 
   Arena* arena;
-  const ClassInfo* info = nullptr;  ///< null where the schema does not have the class
+  const ClassInfo* info = nullptr;  ///< null if the schema does not have the class
   StringObject* nameSpace;
   StringObject* host;
   StringObject* className;
@@ -176,12 +176,12 @@ struct InstanceObject : CMPIInstance {
   static InstanceObject* make(Arena& arena, const PathObject& path);
 
   const Slot* find(const PropertyInfo& property) const noexcept;
-  /// Sets it whatever the filter says. `data` lives in this object's arena.
+  /// Sets it even if the filter excludes it. `data` lives in this object's arena.
   void set(const PropertyInfo& property, const CMPIData& data);
   bool passes(const PropertyInfo& property) const noexcept {
     return filter == nullptr || (filter[property.index / 64] >> (property.index % 64) & 1U) != 0;
   }
-  /// The name of this instance, in `into`: namespace, host, and the keys that are set.
+  /// The name of this instance, made in `into`: namespace, host, and the keys that are set.
   PathObject* path(Arena& into) const;
 
   Arena* arena;
@@ -191,9 +191,9 @@ struct InstanceObject : CMPIInstance {
   Slot* slots = nullptr;
   std::uint32_t count = 0;
   std::uint32_t capacity = 0;
-  std::uint64_t present = 0;             ///< a bit for those that are set, by their index modulo 64
+  std::uint64_t present = 0;             ///< a bit for each set property, by its index modulo 64
   std::uint64_t* filter = nullptr;       ///< a bit for each property that may be set; null: all
-  const EntryList* looseKeys = nullptr;  ///< of a class without key properties: those of the path it was made from
+  const EntryList* looseKeys = nullptr;  ///< if the class has no key properties: the keys of the path it was made from
 };
 
 struct ArgsObject : CMPIArgs {
@@ -208,7 +208,7 @@ struct ArgsObject : CMPIArgs {
   EntryList list;
 };
 
-/// What an up-call of enumeration gives back.
+/// The result of an enumerating up-call.
 struct EnumerationObject : CMPIEnumeration {
   using Handle = CMPIEnumeration;
   static CMPIEnumerationFT table;
@@ -253,7 +253,7 @@ struct ErrorObject : CMPIError {
   ErrorObject(const ErrorObject&) = delete;
   ErrorObject& operator=(const ErrorObject&) = delete;
 
-  /// What does not hold texts or arrays.
+  /// All members that are neither texts nor arrays.
   struct Codes {
     CMPIErrorType type = UnknownErrorType;
     CMPIErrorSeverity severity = ErrorSevUnknown;
@@ -279,10 +279,10 @@ struct ErrorObject : CMPIError {
 /// True where `table` is the function table of one of this broker's objects.
 bool isOwnTable(const void* table) noexcept;
 
-/// "CMPIInstance" and so on; null where `object` is none of this broker's.
+/// "CMPIInstance" and so on; null if `object` belongs to another broker.
 const char* typeNameOf(const void* object) noexcept;
 
-/// The object behind a handle of this broker, else null. Constness is dropped: CMPI's own setters take const handles.
+/// The object of a handle of this broker, else null. Constness is dropped: CMPI's own setters take const handles.
 template <class Object>
 Object* own(const typename Object::Handle* handle) noexcept {
   if (handle == nullptr || handle->ft != &Object::table || handle->hdl == nullptr) return nullptr;
@@ -295,7 +295,7 @@ bool isForeign(const Handle* handle) noexcept {
   return handle != nullptr && handle->hdl != nullptr && handle->ft != nullptr && !isOwnTable(handle->ft);
 }
 
-/// The function table of all results, by which a handle is known as one.
+/// The function table of all results; it marks a handle as a result.
 extern CMPIResultFT resultTable;
 
 }  // namespace zorva::broker

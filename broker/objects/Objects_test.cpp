@@ -14,7 +14,7 @@
 #include "broker/objects/Scope.h"
 #include "broker/testing/TestClasses.h"
 
-// CMPI objects as a provider sees them: through their function tables alone.
+// CMPI objects as a provider sees them: only through their function tables.
 
 namespace zorva::broker {
 namespace {
@@ -449,7 +449,7 @@ TEST_F(ObjectsTest, ACloneOutlivesTheScopeItWasMadeIn) {
   }
   EXPECT_EQ(textOf(get(kept, "Name").value.string), textOf(keptText));
   EXPECT_EQ(shown(get(kept, "Labels").value.array), "{\"label\"}");
-  // What belongs to a clone ends with the clone alone.
+  // The parts of a clone live as long as the clone.
   CMPIString* part = get(kept, "Name").value.string;
   EXPECT_EQ(part->ft->release(part).rc, CMPI_RC_OK);
   EXPECT_EQ(textOf(get(kept, "Name").value.string), textOf(keptText));

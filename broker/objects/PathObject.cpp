@@ -59,7 +59,7 @@ CMPIStatus addKey(CMPIObjectPath* handle, const char* name, const CMPIValue* val
   CMPIData data;
   const CMPIrc rc = importData(*self->arena, value, type, data);
   if (rc != CMPI_RC_OK) return {rc, nullptr};
-  // A key that the class lacks is kept: what it is good for is for those to judge who are given the path.
+  // A key that the class lacks is kept: the receiver of the path checks it.
   const PropertyInfo* known = self->info != nullptr ? self->info->findKey(self->keys.size(), name) : nullptr;
   if (known != nullptr && fitData(*known, data) != CMPI_RC_OK) {
     return statusOf(CMPI_RC_ERR_TYPE_MISMATCH, std::string(name) + " is declared with another type");

@@ -12,7 +12,7 @@ namespace {
 
 bool isLetter(char c) noexcept { return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z'); }
 bool isDigit(char c) noexcept { return c >= '0' && c <= '9'; }
-// CIM names may hold any character of the Basic Multilingual Plane from U+0080 on (DSP0004 5.1.2.1).
+// CIM names may contain any character of the Basic Multilingual Plane from U+0080 on (DSP0004 5.1.2.1).
 bool startsName(char c) noexcept { return isLetter(c) || c == '_' || static_cast<unsigned char>(c) >= 0x80; }
 bool continuesName(char c) noexcept { return startsName(c) || isDigit(c); }
 
@@ -85,7 +85,8 @@ class Reader {
     return true;
   }
 
-  // "root/cimv2:": there is a namespace if a colon comes before the first character that only follows the class name.
+  // "root/cimv2:": there is a namespace if a colon comes before the first character that can only follow the class
+  // name.
   bool readNameSpace(ObjectPath& path) {
     const std::size_t colon = text_.find_first_of(":.=\"", position_);
     if (colon == std::string_view::npos || text_[colon] != ':') {
@@ -123,7 +124,7 @@ class Reader {
       NamedValue key;
       if (!readName("a key's name", key.name)) return false;
       if (path.key(key.name) != nullptr) return failAt(start, "the key " + key.name + " is there already");
-      // Looking a key up in the list of those before it is quadratic: a path with this many keys is no path.
+      // Each key is compared with all keys before it, so the cost is quadratic. No real path has this many keys.
       if (path.keys.size() >= 256) return failAt(start, "more than 256 keys");
       if (peek() != '=' || atEnd()) return expected("'=' after the key's name");
       ++position_;
@@ -239,7 +240,7 @@ std::string realText(double number) {
   char buffer[40];
   const auto result = std::to_chars(buffer, buffer + sizeof buffer, number);
   std::string text(buffer, result.ptr);
-  // Without a point the reader takes it for an integer, or for nothing where it has an exponent.
+  // Without a point the reader takes it for an integer, or refuses it if it has an exponent.
   if (text.find('.') == std::string::npos && text.find_first_of("in") == std::string::npos) {
     text.insert(std::min(text.find('e'), text.size()), ".0");
   }
@@ -268,7 +269,7 @@ std::optional<PathTextError> parsePathText(std::string_view text, ObjectPath& pa
 
 std::string pathText(const ObjectPath& path) {
   std::string text;
-  // A host is written only before a namespace: the form has no place for it elsewhere.
+  // A host is written only before a namespace: the syntax has no other place for it.
   if (!path.host.empty() && !path.nameSpace.empty()) text += "//" + path.host + "/";
   if (!path.nameSpace.empty()) text += path.nameSpace + ":";
   text += path.className;

@@ -13,26 +13,26 @@
 //   root/cimv2:ZORVA_DNSProtocolEndPoint.Name="eth0"
 //   //host1/root/cimv2:ZORVA_DNSGenOrderedComponent.GroupComponent="root/cimv2:ZORVA_X.InstanceID=\"a\""
 //
-// A key's value is a text in double quotes, in which \" \\ \n \t \r \b \f \xHHHH stand for what they do in MOF, or an
-// integer, a real number, TRUE or FALSE. A reference is the text of its path, in quotes like any text; the schema alone
-// knows which texts are references, so the reader leaves them as texts. These functions keep no state.
+// A key's value is a text in double quotes, in which \" \\ \n \t \r \b \f \xHHHH have the same meaning as in MOF, or an
+// integer, a real number, TRUE or FALSE. A reference is the text of its path, in quotes like any text. Only the schema
+// knows which texts are references, so the reader returns them as texts. These functions keep no state.
 
 namespace zorva::broker {
 
-/// Where a path text goes wrong, and how.
+/// The place of an error in a path text, and its reason.
 struct PathTextError {
   std::size_t position = 0;  ///< in bytes from 0
   std::string message;       ///< what was expected there and what was found
 };
 
-/// The longest text that is read, in bytes.
+/// The longest accepted text, in bytes.
 inline constexpr std::size_t kMaxPathText = 65536;
 
 /// Reads a path; a class name without keys is one too. On an error, `path` is left in an unspecified state. Time and
-/// memory grow with the text alone.
+/// memory depend only on the length of the text.
 std::optional<PathTextError> parsePathText(std::string_view text, ObjectPath& path);
 
-/// The path's text; parsePathText reads it back, its references as texts.
+/// The path's text; parsePathText reads it back, with references as texts.
 std::string pathText(const ObjectPath& path);
 
 /// `text` in double quotes, escaped as in MOF.

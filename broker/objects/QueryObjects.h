@@ -3,9 +3,9 @@
 #include "cmpidt.h"
 #include "cmpift.h"
 
-// Query expressions. This broker runs no queries and delivers no indications, so it never makes such an object; one of
-// each kind exists so that their function tables do: every function of them answers CMPI_RC_ERR_NOT_SUPPORTED, save
-// that releasing one is harmless.
+// Query expressions. This broker runs no queries and delivers no indications, so it never makes such an object. One
+// object of each kind exists, so that its function table can be reached. All their functions answer
+// CMPI_RC_ERR_NOT_SUPPORTED, except that releasing one does nothing.
 
 namespace zorva::broker {
 

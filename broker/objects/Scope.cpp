@@ -10,7 +10,7 @@ namespace zorva::broker {
 
 namespace {
 
-// What a request for one instance needs.
+// Enough for a request for one instance.
 constexpr std::size_t kFirstBlock = 4096;
 
 thread_local Scope* innermost = nullptr;
@@ -27,7 +27,7 @@ Scope::Scope(const ClassTable& classes, BlockCache& blocks)
 }
 
 Scope::~Scope() {
-  // A broker that ends closes the scopes of threads that never detached, and does so on its own thread.
+  // A broker that ends closes the scopes of threads that never detached, on its own thread.
   if (innermost == this) innermost = parent_;
 }
 

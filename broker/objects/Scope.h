@@ -10,9 +10,9 @@
 #include "broker/objects/Arena.h"
 #include "cmpidt.h"
 
-// What one request on one thread has: the arena in which its CMPI objects are made, and the memory that its providers
-// asked for. Scopes nest as requests do: an up-call opens one within its caller's. The innermost scope of a thread is
-// the one in which objects are made.
+// The memory of one request on one thread: the arena in which its CMPI objects are made, and the memory that its
+// providers allocated. Scopes nest as requests do: an up-call opens one within its caller's. Objects are made in the
+// innermost scope of a thread.
 
 namespace zorva::broker {
 
@@ -34,7 +34,7 @@ class Scope {
   Scope* parent() const noexcept { return parent_; }
   unsigned depth() const noexcept { return depth_; }
 
-  /// Whether this request, or one that it is a part of, holds a claim. Others may ask and set it on any thread.
+  /// Whether this request, or an outer one, holds a claim. Nested requests may read and set it on any thread.
   bool isClaimed() const noexcept;
   void setClaimed(bool isClaimed) noexcept { isClaimed_ = isClaimed; }
 
@@ -44,16 +44,16 @@ class Scope {
   /// Makes all arenas of the scope safe for the threads that a provider is about to attach.
   void share() noexcept;
 
-  /// What is made from here on goes at release(mark), at the latest with the scope.
+  /// Objects that are made from now on are freed by release(mark), or with the scope.
   const void* mark();
-  /// False where `mark` is none of this scope. Later marks go with it.
+  /// False if `mark` is not of this scope. Later marks are released too.
   bool release(const void* mark);
 
-  /// Memory that goes with the scope. Null for want of memory, as malloc.
+  /// Memory that is freed with the scope. Null if out of memory, like malloc.
   void* allocate(std::size_t size);
-  /// Null, with the block unchanged, where `block` is not of this scope.
+  /// Null, with the block unchanged, if `block` is not of this scope.
   void* reallocate(void* block, std::size_t size);
-  /// Passes over what is not of this scope.
+  /// Ignores a block that is not of this scope.
   void free(void* block);
 
  private:

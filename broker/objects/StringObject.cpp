@@ -29,7 +29,7 @@ CMPIStringFT StringObject::table = {
 };
 
 StringObject* StringObject::make(Arena& arena, std::string_view text) {
-  // Object and characters in one piece.
+  // Object and characters are one piece of memory.
   auto* memory = static_cast<char*>(arena.allocate(sizeof(StringObject) + text.size() + 1));
   char* chars = memory + sizeof(StringObject);
   if (!text.empty()) std::memcpy(chars, text.data(), text.size());
@@ -49,7 +49,7 @@ CMPIStatus statusOf(CMPIrc rc, std::string_view message) noexcept {
   try {
     status.msg = StringObject::make(*arena, message);
   } catch (const std::bad_alloc&) {
-    // The code alone says enough.
+    // Without memory for the message the code alone is returned.
   }
   return status;
 }

@@ -8,14 +8,14 @@
 
 #include "broker/objects/Objects.h"
 
-// What all function tables of the broker share. Their functions are called from C: nothing may be thrown out of them,
-// and each answers a handle that is null, of the wrong kind or foreign with CMPI_RC_ERR_INVALID_HANDLE.
+// Shared by all function tables of the broker. Their functions are called from C: they must not throw. They answer a
+// handle that is null, of the wrong kind or of another broker with CMPI_RC_ERR_INVALID_HANDLE.
 
 namespace zorva::broker {
 
 inline constexpr int kTableVersion = CMPIVersion200;
 
-/// A status whose message is made in the innermost scope of the thread; without a scope it has none.
+/// A status whose message is made in the innermost scope of the thread; without a scope it has no message.
 CMPIStatus statusOf(CMPIrc rc, std::string_view message = {}) noexcept;
 
 inline void setStatus(CMPIStatus* status, CMPIrc rc) noexcept {
@@ -25,7 +25,7 @@ inline void setStatus(CMPIStatus* status, CMPIrc rc, std::string_view message) n
   if (status != nullptr) *status = statusOf(rc, message);
 }
 
-/// Sets the status and gives an empty result: null, 0, or data without a value.
+/// Sets the status and returns an empty result: null, 0, or data without a value.
 template <class Result>
 Result failed(CMPIStatus* status, CMPIrc rc, std::string_view message = {}) noexcept {
   setStatus(status, rc, message);
@@ -36,7 +36,7 @@ Result failed(CMPIStatus* status, CMPIrc rc, std::string_view message = {}) noex
   }
 }
 
-/// For functions whose object is the null or wrong one.
+/// For functions whose object is null or of the wrong kind.
 template <class Result>
 Result badHandle(CMPIStatus* status) noexcept {
   return failed<Result>(status, CMPI_RC_ERR_INVALID_HANDLE);
@@ -63,9 +63,9 @@ struct Guarded<function> {
     try {
       return function(args...);
     } catch (const abi::__forced_unwind&) {
-      throw;  // the thread is being ended: this must go on
+      throw;  // the thread is being cancelled: this must be rethrown
     } catch (...) {
-      // Only memory can be short here.
+      // This can only be std::bad_alloc.
       if constexpr (std::is_same_v<Result, CMPIStatus>) {
         return {CMPI_RC_ERR_FAILED, nullptr};
       } else if constexpr (!std::is_void_v<Result>) {
@@ -77,11 +77,11 @@ struct Guarded<function> {
 
 }  // namespace detail
 
-/// The function as it goes into a table: an exception within becomes CMPI_RC_ERR_FAILED.
+/// The function as it is entered in a table: an exception becomes CMPI_RC_ERR_FAILED.
 template <auto function>
 inline constexpr auto guarded = &detail::Guarded<function>::call;
 
-/// `release` of every kind: ends an object that clone() made, and is harmless for all others.
+/// `release` of every kind: frees an object that clone() made, and does nothing for all others.
 template <class Object>
 CMPIStatus releaseObject(typename Object::Handle* handle) noexcept {
   Object* self = own<Object>(handle);
@@ -90,7 +90,7 @@ CMPIStatus releaseObject(typename Object::Handle* handle) noexcept {
   return {CMPI_RC_OK, nullptr};
 }
 
-/// `clone` of every kind: `copy(Arena&, const Object&)` makes the copy in an arena of its own.
+/// `clone` of every kind: `copy(Arena&, const Object&)` makes the copy in its own arena.
 template <class Object, auto copy>
 typename Object::Handle* cloneObject(const typename Object::Handle* handle, CMPIStatus* status) {
   const Object* self = own<Object>(handle);

@@ -64,7 +64,7 @@ bool isEmpty(const Scalar& scalar) noexcept {
   return text != nullptr ? text->empty() : std::holds_alternative<std::monostate>(scalar);
 }
 
-/// The elements that count; a value that is no list is one of itself.
+/// The elements that count; a value that is no list has itself as its only element.
 std::vector<const Scalar*> contentOf(const Value& value) {
   std::vector<const Scalar*> content;
   if (value.isNull) return content;

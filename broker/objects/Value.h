@@ -10,17 +10,17 @@
 
 #include "schema/ClassRepository.h"
 
-// What goes into the broker and comes out of it, as plain values: texts in UTF-8, numbers, object paths, instances.
-// They own all that they hold and refer to nothing in a provider or a request; the only pointers are into the class
-// repository, which outlives them. No locking: a const value may be read by any number of threads.
+// The broker's input and output as plain values: texts in UTF-8, numbers, object paths, instances. They own all that
+// they hold and refer to nothing in a provider or a request. Their only pointers are into the class repository, which
+// outlives them. No locking: a const value may be read by any number of threads.
 
 namespace zorva::broker {
 
 struct ObjectPath;
 struct Instance;
 
-/// A T on the heap that is copied, compared and moved like the T itself; it lets a value hold its own kind. Never
-/// empty, save after it was moved from, when it may only be assigned to or destroyed.
+/// A T on the heap that is copied, compared and moved like the T itself. It lets a value contain its own kind. Never
+/// empty, except after a move; then it may only be assigned to or destroyed.
 template <class T>
 class Boxed {
  public:
@@ -74,8 +74,8 @@ struct Value {
   bool operator==(const Value&) const = default;
 };
 
-/// True where nobody can tell the two apart once they are set: null, the empty text and the list without texts are one,
-/// and elements without text do not count. Settings have no place for such differences.
+/// True if the two are the same once they are set: null, the empty text and the list without texts are equal, and
+/// elements without text do not count. A setting cannot store such differences.
 bool hasSameEffect(const Value& a, const Value& b);
 
 /// A value with its name: a key of a path, or a parameter of a method.
@@ -86,14 +86,14 @@ struct NamedValue {
   bool operator==(const NamedValue&) const = default;
 };
 
-/// The name of an instance. Empty texts stand for what is not given.
+/// The name of an instance. An empty text means that the part is not given.
 struct ObjectPath {
   std::string host;
   std::string nameSpace;
   std::string className;
   std::vector<NamedValue> keys;
 
-  /// The value of a key, its name in any case; null where the path has no such key.
+  /// The value of a key, its name in any case; null if the path has no such key.
   const Value* key(std::string_view name) const noexcept;
 
   bool operator==(const ObjectPath&) const = default;
@@ -103,19 +103,19 @@ struct ObjectPath {
 struct Property {
   std::string name;
   Value value;
-  const schema::ClassProperty* declaration = nullptr;  ///< set on what the broker gives; not needed on what it takes
+  const schema::ClassProperty* declaration = nullptr;  ///< set in results of the broker; not needed in its arguments
 
   bool operator==(const Property& other) const { return name == other.name && value == other.value; }
 };
 
-/// An instance. What the broker gives has every property of its class, save those that a property list leaves out:
-/// first those that were set, in the order in which they were set, then the others as null.
+/// An instance. In results of the broker it has every property of its class, except those that a property list leaves
+/// out: first the properties that were set, in the order in which they were set, then the others as null.
 struct Instance {
-  ObjectPath path;  ///< its class and, on what the broker gives, its name
+  ObjectPath path;  ///< its class and, in results of the broker, its name
   std::vector<Property> properties;
-  const schema::Class* declaration = nullptr;  ///< set on what the broker gives
+  const schema::Class* declaration = nullptr;  ///< set in results of the broker
 
-  /// The value of a property, its name in any case; null where the instance has no such property.
+  /// The value of a property, its name in any case; null if the instance has no such property.
   const Value* property(std::string_view name) const noexcept;
 
   bool operator==(const Instance& other) const { return path == other.path && properties == other.properties; }

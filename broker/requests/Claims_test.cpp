@@ -1,4 +1,4 @@
-// What a request holds while its provider works.
+// The claim that a request holds while its provider works.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
@@ -27,7 +27,7 @@ class ClaimsTest : public ::testing::Test {
     broker_.emplace(testing::testClasses(), std::move(options));
   }
 
-  /// Writes down its life.
+  /// Records when it is made, finished and destroyed.
   class Noted : public Claim {
    public:
     Noted(std::vector<std::string>& story, Status end) : story_(story), end_(std::move(end)) {}

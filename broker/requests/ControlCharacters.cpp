@@ -21,7 +21,7 @@ std::optional<std::uint32_t> findIn(const Scalar& scalar);
 std::optional<std::uint32_t> findIn(std::string_view text) {
   while (!text.empty()) {
     const std::size_t length = schema::utf8Length(text);
-    // What is no UTF-8 is for others to refuse.
+    // Invalid UTF-8 is refused elsewhere.
     const std::uint32_t code = length == 0 ? ' ' : schema::utf8Decode(text);
     if (isRefused(code)) return code;
     text.remove_prefix(std::max<std::size_t>(length, 1));

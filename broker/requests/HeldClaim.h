@@ -8,7 +8,7 @@
 
 namespace zorva::broker {
 
-/// A claim of a request, and the mark of it on the request's scope. The scope outlives it.
+/// A claim of a request, and its mark in the request's scope. The scope outlives it.
 class HeldClaim {
  public:
   HeldClaim(Scope& scope, std::unique_ptr<Claim> claim) : scope_(scope), claim_(std::move(claim)) {
@@ -18,7 +18,8 @@ class HeldClaim {
   HeldClaim(const HeldClaim&) = delete;
   HeldClaim& operator=(const HeldClaim&) = delete;
 
-  /// How the request ends that ended like this: a failure that its provider did not notice comes first.
+  /// The final status of a request that ended with this one: a failure that its provider did not notice takes
+  /// precedence.
   Status finish(Status status) {
     Status unnoticed = claim_->finish();
     return unnoticed.ok() ? std::move(status) : std::move(unnoticed);

@@ -41,7 +41,7 @@ Status checkListedNames(const ModificationRequest& request) {
   return {};
 }
 
-/// A key may be repeated with the value of the path or, where the provider takes other paths too, with its own.
+/// A key may be repeated with the value of the path or, if the provider accepts other paths too, with its own value.
 Status checkKeys(const ModificationRequest& request) {
   for (const PropertyInfo* key : request.given.info->keys()) {
     const InstanceObject::Slot* slot = request.given.find(*key);
@@ -60,7 +60,7 @@ bool isListed(const Shape& shape, const PropertyInfo& property) {
                      [&](std::string_view name) { return schema::sameName(name, property.name->view()); });
 }
 
-/// The value that the client names for the property and that it has not yet; null where there is none.
+/// The value that the client names for the property, if it is not the current one; else null.
 const CMPIData* newValue(const ModificationRequest& request, const PropertyInfo& property) {
   const InstanceObject::Slot* slot = request.given.find(property);
   if (property.isKey || slot == nullptr || !isListed(request.shape, property)) return nullptr;
@@ -85,7 +85,7 @@ void handOver(const ModificationRequest& request, const PropertyInfo& property, 
   if (slot != nullptr && slot->data.state == CMPI_goodValue) handed.set(property, copyData(*handed.arena, slot->data));
 }
 
-/// Where the current values are not known, the provider must judge of properties that cannot be changed.
+/// If the current values are not known, the provider must check the properties that cannot be changed.
 Status checkWritable(const ModificationRequest& request, const Modification& modification) {
   if (request.current == nullptr) return {};
   std::string names;

@@ -7,31 +7,31 @@
 #include "broker/objects/Value.h"
 #include "broker/requests/ResultFilter.h"
 
-// What a modification comes to (DSP0200 5.3.2.8): which properties it changes, and what the provider is handed so that
-// all others stay as they are.
+// Works out a modification (DSP0200 5.3.2.8): which properties it changes, and what the provider gets so that all
+// others keep their values.
 
 namespace zorva::broker {
 
-/// A modification as it was asked for. All that it refers to outlives it.
+/// A modification as requested. All that it refers to outlives it.
 struct ModificationRequest {
-  const PathObject& path;         ///< of what is to be changed, in the schema's spelling
+  const PathObject& path;         ///< of the instance to change, in the schema's spelling
   const InstanceObject& given;    ///< of the same class
-  const InstanceObject* current;  ///< the instance as it is; null where its provider cannot read it
+  const InstanceObject* current;  ///< the current instance; null if its provider cannot read it
   const Shape& shape;             ///< its property list; absent: all that `given` has
   const ProviderEntry& provider;
 };
 
 struct Modification {
-  InstanceObject* handed = nullptr;          ///< what the provider is to get
-  std::vector<const PropertyInfo*> changed;  ///< empty: there is nothing to do
+  InstanceObject* handed = nullptr;          ///< the instance that the provider gets
+  std::vector<const PropertyInfo*> changed;  ///< empty: nothing to do
 };
 
-/// Works a modification out, in `arena`. A property is changed where the client names it with another value than it
-/// has. CIM_ERR_INVALID_PARAMETER for a listed name that the class lacks and for a key with another value;
+/// Works a modification out, in `arena`. A property is changed if the client names it with a value that is not the
+/// current one. CIM_ERR_INVALID_PARAMETER for a listed name that the class lacks and for a key with another value;
 /// CIM_ERR_NOT_SUPPORTED for a change of a property without the qualifier Write.
 ///
-/// The provider gets the changed properties, and the current values of all others, save of those that it leaves alone
-/// when they are missing (ProviderEntry::keeps): writing those again could still change what lies around them.
+/// The provider gets the changed properties and the current values of all others, except those that it leaves unchanged
+/// when they are missing (ProviderEntry::keeps): writing those again could still change the text around them.
 Status planModification(Arena& arena, const ModificationRequest& request, Modification& modification);
 
 }  // namespace zorva::broker

@@ -1,4 +1,4 @@
-// What a modification hands to the provider, and what is refused before.
+// What a modification passes to the provider, and what is refused before that.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
@@ -23,7 +23,7 @@ class ModificationTest : public ::testing::Test {
  protected:
   ModificationTest() { start({}); }
 
-  /// A broker whose provider leaves `keeps` alone where a modification lacks them.
+  /// A broker whose provider leaves the properties `keeps` unchanged if a modification lacks them.
   void start(const std::vector<std::string>& keeps) {
     BrokerOptions options;
     options.registry = ProviderRegistry();

@@ -7,11 +7,11 @@
 
 #include "broker/objects/Value.h"
 
-// What a client says of an operation, and what takes its results.
+// A client's parameters of an operation, and the types that take its results.
 
 namespace zorva::broker {
 
-/// What the providers learn of the client, as entries of the CMPI context. Empty texts make no entry.
+/// What the providers get to know about the client, as entries of the CMPI context. Empty texts make no entry.
 struct Caller {
   std::string principal;
   std::string role;
@@ -19,19 +19,19 @@ struct Caller {
   std::string contentLanguage;
 };
 
-/// What of each instance is wanted (DSP0200 5.3.2.2, 5.3.2.11). Qualifiers and class origins are added by who writes
-/// the answer, from Property::declaration; here they are only told to the provider.
+/// The requested part of each instance (DSP0200 5.3.2.2, 5.3.2.11). Qualifiers and class origins are added by the code
+/// that writes the response, from Property::declaration; here they are only passed to the provider.
 struct Selection {
   bool localOnly = false;
   bool deepInheritance = true;
   bool includeQualifiers = false;
   bool includeClassOrigin = false;
-  /// Absent: all properties. Names that the class lacks are passed over. Keys come only if they are named; the path of
-  /// the instance has them all the same.
+  /// Absent: all properties. Names that the class lacks are ignored. Keys are included only if they are named; the path
+  /// of the instance always has them.
   std::optional<std::vector<std::string>> propertyList;
 };
 
-/// Which associations and far ends are wanted; empty texts stand for what is omitted. For references,
+/// The requested associations and far ends; an empty text means that the parameter is omitted. For references,
 /// `associationClass` is the operation's ResultClass, and `resultClass` and `resultRole` are not used.
 struct AssociationFilter {
   std::string associationClass;
@@ -40,22 +40,24 @@ struct AssociationFilter {
   std::string resultRole;
 };
 
-/// Takes results one by one while the provider makes them. What is referred to is the broker's and holds until the sink
-/// returns: copy what is to be kept. false: no more are wanted; the operation then ends as soon as the provider does.
+/// Takes results one by one while the provider makes them. The arguments belong to the broker and are valid until the
+/// sink returns: copy what must be kept. False means that no more results are needed; the operation then ends as soon
+/// as the provider does.
 using InstanceSink = std::function<bool(const Instance& instance)>;
 using PathSink = std::function<bool(const ObjectPath& path)>;
 
-/// What a method gave back.
+/// The result of a method.
 struct MethodResult {
-  Value returnValue;               ///< null where the provider returned none
+  Value returnValue;               ///< null if the provider returned none
   std::vector<NamedValue> output;  ///< in the order in which the provider set them
 };
 
-/// What a modification was to change, and what came of it: providers may say success and have stored nothing.
+/// What a modification was to change, and its effect: a provider may report success and store nothing.
 struct ModificationEffect {
-  std::vector<Property> changes;  ///< what the provider was asked to change, in the types that the schema declares
-  Status reading;                 ///< of reading the instance again, under the same claim; only after a success
-  Instance now;                   ///< where that was a success, and there were changes
+  std::vector<Property>
+      changes;     ///< the changes that the provider was asked to make, in the types that the schema declares
+  Status reading;  ///< status of reading the instance again, under the same claim; only after a success
+  Instance now;    ///< if that was a success, and there were changes
 };
 
 }  // namespace zorva::broker

@@ -13,13 +13,13 @@ namespace zorva::broker {
 
 namespace {
 
-// Providers that call up in a circle would otherwise end the process when the stack is used up.
+// Without a limit, providers that call each other in a circle would use up the stack and end the process.
 constexpr unsigned kDeepest = 32;
 
 /// How an operation that asks several providers ends.
 class Outcome {
  public:
-  /// `passedOver`: the answer counts only if all answers are such.
+  /// `passedOver`: the answer counts only if all answers are passed over.
   void add(Status status, bool passedOver) {
     ++asked_;
     if (status.ok()) return;
@@ -40,7 +40,7 @@ class Outcome {
   Status firstPassedOver_;
 };
 
-/// What a provider makes for one of several classes goes before the next is asked.
+/// Frees what a provider made for one of several classes before the next one is asked.
 class MarkGuard {
  public:
   explicit MarkGuard(Scope& scope) : scope_(scope), mark_(scope.mark()) {}
@@ -59,11 +59,11 @@ std::string quoted(std::string_view name) { return quotedText(name.substr(0, 200
 
 }  // namespace
 
-/// An association class that is to be asked, and under which names.
+/// An association class to be asked, and the names to ask with.
 struct Request::Association {
   const ClassInfo* info;
   const ProviderEntry* entry;
-  const ClassInfo* farClass;  ///< of the far end that fits first
+  const ClassInfo* farClass;  ///< of the first far end that fits
   const char* role;           ///< null where the client gave none
   const char* resultRole;
 };
@@ -166,7 +166,7 @@ Status Request::call(ResultObject& result, const ProviderEntry& entry, std::stri
     if (status.ok()) status.rc = result.errorCode;
     if (status.message.empty()) status.message = result.errorMessage;
   } else if (result.full) {
-    return {};  // the provider may have taken it for a failure that nothing more was wanted
+    return {};  // the provider may have reported a failure only because no more results were needed
   }
   if (!status.ok() && status.message.empty()) {
     status.message = status.rc == CMPI_RC_ERR_NOT_SUPPORTED ? what + " is not supported by the provider"
@@ -222,7 +222,7 @@ Status Request::enumerate(const PathObject& path, Form form, const Shape& shape,
 
 namespace {
 
-/// Hands on the first instance alone.
+/// Passes only the first instance on.
 class FirstTaker : public Taker {
  public:
   explicit FirstTaker(Taker& taker) : taker_(taker) {}
@@ -265,7 +265,7 @@ Status Request::get(const PathObject& path, const Shape& shape, Taker& taker) {
   Status status = findInstanceMi(path, "GetInstance", resolved, entry, mi);
   if (status.rc == CMPI_RC_ERR_NOT_SUPPORTED && resolved != nullptr &&
       !servedBelow(*resolved, *resolved->info).empty()) {
-    // The class of an instance's name is the one that it was made of, never one above it.
+    // The class in an instance's name is the class that it was made of, never a superclass.
     return failure(CMPI_RC_ERR_NOT_FOUND, "no instance has " + resolved->info->name() + " itself as its class");
   }
   if (!status.ok()) return status;
@@ -298,7 +298,7 @@ Status Request::create(const PathObject& path, const InstanceObject& instance, T
   ResultObject result(core_, ResultObject::Paths, &filter, entry->prefix);
   status = call(result, *entry, "CreateInstance", mi->ft->createInstance, const_cast<CMPIInstanceMI*>(mi), &context_,
                 &result, resolved, given);
-  // A provider that returns no name made the instance that it was given.
+  // If a provider returns no name, it made the given instance under the given name.
   if (status.ok() && !first.found()) taker.takePath(*given->path(arena()));
   return status;
 }
@@ -341,7 +341,7 @@ Status Request::modify(const PathObject& path, const InstanceObject& instance, c
   if (!status.ok()) return status;
   CurrentTaker taker(arena());
   status = get(*resolved, Shape(), taker);
-  // A provider that cannot be read is handed what the client gave.
+  // If the provider cannot be read, it gets the instance as the client gave it.
   if (!status.ok() && status.rc != CMPI_RC_ERR_NOT_SUPPORTED) return status;
   Modification modification;
   status = planModification(arena(), {*resolved, instance, taker.current(), shape, *entry}, modification);
@@ -380,7 +380,7 @@ bool named(const schema::ClassProperty& end, std::string_view role) {
   return role.empty() || schema::sameName(end.name, role);
 }
 
-/// The first pair of ends that fits; without a far end where that does not matter.
+/// The first pair of ends that fits; without a far end if the filter does not restrict it.
 Ends fittingEnds(const schema::Class& association, const schema::Class& source, const FarEnd& filter,
                  bool farEndMatters, const schema::Class* resultClass) {
   for (const schema::ClassProperty* nearEnd : association.references()) {
@@ -454,7 +454,7 @@ Status Request::associated(const PathObject& path, Form form, const FarEnd& filt
   if (!status.ok()) return status;
   ResultFilter results(core_, scope_, shape, nullptr, resolved->nameSpace->view(), taker);
   results.within = resultClass;
-  // The provider is asked without a result class: its own idea of one may know no classes above its own.
+  // The provider is asked without a result class: it may not know the superclasses of its own classes.
   return askEach(associations, results, [&](const Association& one, CMPIAssociationMI* mi) {
     const char* name = one.info->name().c_str();
     if (form == Form::Paths) {
@@ -480,7 +480,8 @@ Status Request::referring(const PathObject& path, Form form, const FarEnd& filte
   status = findAssociations(*resolved, filter, false, associations, unused);
   if (!status.ok()) return status;
   ResultFilter results(core_, scope_, shape, nullptr, resolved->nameSpace->view(), taker);
-  // Not the class that the provider is asked for: one may name its associations by the class of a sister association.
+  // Not the class that the provider is asked for: a provider may name its associations by the class of a sibling
+  // association.
   if (!filter.associationClass.empty()) results.within = core_.classes().find(filter.associationClass);
   return askEach(associations, results, [&](const Association& one, CMPIAssociationMI* mi) {
     const char* name = one.info->name().c_str();

@@ -12,8 +12,8 @@
 #include "broker/requests/Result.h"
 #include "broker/requests/ResultFilter.h"
 
-// One request, of a client or of a provider that calls up: which providers are asked, what they are handed, and what of
-// their answers goes on. It opens a scope on its thread that ends with it.
+// One request, of a client or of a provider's up-call: which providers are asked, what they get, and which of their
+// results are passed on. It opens a scope on its thread that ends with it.
 
 namespace zorva::broker {
 
@@ -36,15 +36,15 @@ class Request {
 
   Scope& scope() noexcept { return scope_; }
   Arena& arena() noexcept { return scope_.arena(); }
-  /// What the providers are given; empty at first.
+  /// The context for the providers; empty at first.
   ContextObject& context() noexcept { return context_; }
 
-  /// Takes the claim that providers of a class need, unless this request has one already; `held` stays null where there
-  /// is none.
+  /// Takes the claim that providers of a class need, unless this request has one already; `held` stays null if there is
+  /// none.
   Status claim(Access access, std::string_view className, const ObjectPath* changed, std::unique_ptr<HeldClaim>& held);
 
-  // The operations. `path` lives in this request's arena or outlives it; its namespace may be in any spelling, and
-  // empty for the default. Statuses as Broker.h tells.
+  // The operations. `path` lives in this request's arena or outlives it. Its namespace may be in any spelling; empty
+  // means the default. Statuses as in Broker.h.
   Status enumerate(const PathObject& path, Form form, const Shape& shape, Taker& taker);
   Status get(const PathObject& path, const Shape& shape, Taker& taker);
   Status create(const PathObject& path, const InstanceObject& instance, Taker& taker);
@@ -57,7 +57,7 @@ class Request {
   Status invoke(const PathObject& path, std::string_view method, const EntryList& input, CMPIData& value,
                 EntryList& output);
 
-  /// `path` with the class `info` and the namespace as the registry spells it; a failure where either is unknown.
+  /// `path` with the class `info` and the namespace as the registry spells it; a failure if either is unknown.
   Status resolve(const PathObject& path, PathObject*& resolved);
 
  private:
@@ -70,7 +70,7 @@ class Request {
                           std::vector<Association>& found, const ClassInfo*& resultClass) const;
   const char** providerList(const Shape& shape, const std::vector<const ClassInfo*>& classes);
 
-  /// Calls a slot of a provider's table, null where the provider lacks it. What it throws becomes a failure.
+  /// Calls a function of a provider's table, null if the provider lacks it. Its exceptions become a failure.
   template <class Function, class... Args>
   Status call(ResultObject& result, const ProviderEntry& entry, std::string_view operation, Function function,
               Args... args);

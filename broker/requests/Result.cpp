@@ -14,8 +14,8 @@ CMPIResult* clone(const CMPIResult* handle, CMPIStatus* status) {
   return failed<CMPIResult*>(status, good ? CMPI_RC_ERR_NOT_SUPPORTED : CMPI_RC_ERR_INVALID_HANDLE);
 }
 
-/// Runs `take` under the result's lock, unless the receiver has enough. What the receiver throws becomes the error of
-/// the operation, not the provider's affair.
+/// Runs `take` under the result's lock, unless the receiver needs no more. An exception of the receiver becomes the
+/// error of the operation; the provider does not see it.
 template <class Take>
 CMPIStatus give(ResultObject& self, Take take) {
   const std::lock_guard lock(self.mutex);
@@ -83,7 +83,7 @@ CMPIStatus returnData(const CMPIResult* handle, const CMPIValue* value, const CM
   return give(*self, [&] { return self->receiver->takeData(data); });
 }
 
-// An operation that ends well is complete with or without it.
+// An operation that ends well is complete even without this call.
 CMPIStatus returnDone(const CMPIResult* handle) {
   return {own<ResultObject>(handle) != nullptr ? CMPI_RC_OK : CMPI_RC_ERR_INVALID_HANDLE, nullptr};
 }

@@ -7,14 +7,14 @@
 #include "broker/objects/Objects.h"
 #include "broker/requests/HeldClaim.h"
 
-// Where a provider puts its results: a CMPIResult that hands each of them on at once to a receiver.
+// A CMPIResult for a provider's results: it passes each one to a receiver at once.
 
 namespace zorva::broker {
 
 class BrokerCore;
 
-/// Takes a provider's results, one at a time. What is referred to lives as long as the call. false: no more are wanted.
-/// What is not overridden drops what it is given.
+/// Takes a provider's results, one at a time. The arguments are valid during the call. False means that no more are
+/// needed. Results are dropped unless the function is overridden.
 class Receiver {
  public:
   virtual ~Receiver() = default;
@@ -23,7 +23,7 @@ class Receiver {
   virtual bool takeData(const CMPIData& data);
 };
 
-/// Lives on the stack of the request. Providers may fill it from several threads, one call at a time gets through.
+/// Lives on the stack of the request. Providers may fill it from several threads; calls are serialized.
 struct ResultObject : CMPIResult {
   using Handle = CMPIResult;
   static constexpr CMPIResultFT& table = resultTable;
@@ -31,7 +31,7 @@ struct ResultObject : CMPIResult {
   /// What an operation's provider may return.
   enum Accepts : unsigned { Nothing = 0, Instances = 1, Paths = 2, Values = 4 };
 
-  /// `receiver` may be null where nothing is accepted. `provider` names it in log lines.
+  /// `taker` may be null if nothing is accepted. `provider` names it in log lines.
   ResultObject(BrokerCore& broker, unsigned accepted, Receiver* taker, std::string provider)
       : CMPIResult{this, &table}, core(broker), accepts(accepted), receiver(taker), who(std::move(provider)) {}
   ResultObject(const ResultObject&) = delete;
@@ -44,11 +44,11 @@ struct ResultObject : CMPIResult {
   const unsigned accepts;
   Receiver* const receiver;
   const std::string who;
-  Arena* arena = nullptr;  ///< it is in none: release() is harmless
+  Arena* arena = nullptr;  ///< null: release() does nothing
 
-  std::mutex mutex;                  // guards what follows
-  std::unique_ptr<HeldClaim> claim;  ///< goes with the first result
-  bool full = false;                 ///< the receiver wants no more
+  std::mutex mutex;                  // guards the next members
+  std::unique_ptr<HeldClaim> claim;  ///< dropped with the first result
+  bool full = false;                 ///< the receiver needs no more
   CMPIrc errorCode = CMPI_RC_OK;
   std::string errorMessage;
 };

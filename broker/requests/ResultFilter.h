@@ -13,18 +13,19 @@
 #include "broker/objects/Scope.h"
 #include "broker/requests/Result.h"
 
-// Between a provider and who takes its results: providers return more than was asked for, and less well named.
+// Filters results between a provider and their receiver: providers return more than was requested, and with incomplete
+// names.
 
 namespace zorva::broker {
 
-/// What of each instance is wanted, as Selection in Broker.h, with the names as they came.
+/// The requested part of each instance, like Selection in Operations.h, with the names as the client gave them.
 struct Shape {
   bool localOnly = false;
   bool deepInheritance = true;
   std::optional<std::vector<std::string_view>> properties;
 };
 
-/// A receiver that takes instances with the mask of the properties that are wanted of them.
+/// A receiver that takes each instance with the mask of its requested properties.
 class Taker {
  public:
   virtual ~Taker() = default;
@@ -32,20 +33,20 @@ class Taker {
   virtual bool takePath(const PathObject& path) = 0;
 };
 
-/// Lets pass what was asked for, each instance with the mask of its wanted properties, each name with its namespace.
-/// What it drops it logs.
+/// Passes on only what was requested: each instance with the mask of its requested properties, each name with its
+/// namespace. Logs what it drops.
 class ResultFilter : public Receiver {
  public:
-  /// `requested`: the class that localOnly and deepInheritance are about; null where they do not apply. All that is
-  /// referred to outlives the filter.
+  /// `requested`: the class to which localOnly and deepInheritance refer; null if they do not apply. All arguments
+  /// outlive the filter.
   ResultFilter(BrokerCore& core, Scope& scope, const Shape& shape, const ClassInfo* requested,
                std::string_view nameSpace, Taker& taker)
       : core_(core), scope_(scope), shape_(shape), requested_(requested), nameSpace_(nameSpace), taker_(taker) {}
 
   const ClassInfo* within = nullptr;    ///< results are of this class or below; null: any
-  const ClassInfo* servedAs = nullptr;  ///< results belong to this class, not to one below that is served itself
+  const ClassInfo* servedAs = nullptr;  ///< results belong to this class, not to a subclass that has its own provider
 
-  /// The taker wants no more.
+  /// The taker needs no more.
   bool full() const noexcept { return full_; }
 
   bool takeInstance(const InstanceObject& instance) override;
@@ -53,7 +54,7 @@ class ResultFilter : public Receiver {
 
  private:
   bool admits(const ClassInfo& info);
-  /// One line for each class: a provider may return thousands.
+  /// Logs one line for each class: a provider may return thousands of instances.
   void logDrop(const ClassInfo& info, std::string_view why);
   bool isServed(const schema::Class& declared) const;
   bool wants(const PropertyInfo& property) const;

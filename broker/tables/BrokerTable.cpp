@@ -6,17 +6,17 @@
 #include "broker/objects/TableSupport.h"
 #include "broker/requests/Request.h"
 
-// CMPIBrokerFT: what the broker is, threads, and the up-calls of providers. An up-call is a request of its own, nested
-// in that of its caller; what it gives back is copied into the caller's scope.
+// CMPIBrokerFT: properties of the broker, threads, and the up-calls of providers. An up-call is a request of its own,
+// nested in that of its caller; its results are copied into the caller's scope.
 //
-// The invocation flags of the context are those of the client's own request and are not applied to what a provider asks
-// for itself: a client that wants local properties only must not take the keys from under a provider's feet.
+// The invocation flags in the context belong to the client's own request and are not applied to up-calls: a client that
+// asks for local properties only must not remove keys that the provider needs.
 
 namespace zorva::broker {
 
 namespace {
 
-/// Copies results into an enumeration of the caller's. Keys come with every instance, so that it has a name.
+/// Copies results into an enumeration of the caller's. Every instance gets its keys, so that it has a name.
 class Collector : public Taker {
  public:
   Collector(Arena& arena, CMPIType type) : enumeration_(*arena.make<EnumerationObject>(arena, type)) {}
@@ -69,7 +69,7 @@ void copyContextEntries(Arena& arena, const CMPIContext* given, ContextObject& c
   context.setFlags(CMPI_FLAG_DeepInheritance);
 }
 
-/// What every up-call begins with: the caller's arena, the checked handles, and the nested request.
+/// The beginning of every up-call: the caller's arena, the checked handles, and the nested request.
 class UpCall {
  public:
   UpCall(const CMPIBroker* broker, const CMPIContext* context, const CMPIObjectPath* path)
@@ -94,7 +94,7 @@ class UpCall {
   std::optional<Request> request_;
 };
 
-/// A status with its message in the scope that is innermost now: to be made when the nested request is gone.
+/// A status with its message in the scope that is innermost now. Call it after the nested request has ended.
 void setResult(CMPIStatus* status, const Status& result) noexcept {
   setStatus(status, static_cast<CMPIrc>(result.rc), result.message);
 }
@@ -109,7 +109,7 @@ Shape shapeOf(const char** properties) {
 
 std::string_view orEmpty(const char* text) noexcept { return text != nullptr ? text : std::string_view(); }
 
-/// Runs `ask(Request&, const PathObject&, Taker&)` and gives what it collected; null on a failure.
+/// Runs `ask(Request&, const PathObject&, Taker&)` and returns what it collected; null on a failure.
 template <class Ask>
 CMPIEnumeration* collected(const CMPIBroker* broker, const CMPIContext* context, const CMPIObjectPath* path,
                            CMPIType type, CMPIStatus* status, Ask&& ask) {
@@ -181,7 +181,7 @@ CMPIEnumeration* referenceNames(const CMPIBroker* broker, const CMPIContext* con
   });
 }
 
-/// The one instance that a path names, in the caller's scope.
+/// The instance that a path names, in the caller's scope.
 InstanceObject* fetch(const CMPIBroker* broker, const CMPIContext* context, const CMPIObjectPath* path,
                       const Shape& shape, CMPIStatus* status) {
   Status result;
@@ -252,7 +252,7 @@ CMPIStatus deliverIndication(const CMPIBroker* broker, const CMPIContext* /*cont
   return {good ? CMPI_RC_ERR_NOT_SUPPORTED : CMPI_RC_ERR_INVALID_HANDLE, nullptr};
 }
 
-/// Adds what a method gave out to the arguments of the caller, ours or another broker's.
+/// Adds a method's output to the arguments of the caller, ours or another broker's.
 void addOutput(const EntryList& output, CMPIArgs* arguments) {
   ArgsObject* known = own<ArgsObject>(arguments);
   for (const EntryList::Entry& entry : output) {
@@ -265,7 +265,7 @@ void addOutput(const EntryList& output, CMPIArgs* arguments) {
   }
 }
 
-/// The arguments behind a handle, ours or another broker's; null where it is neither.
+/// The arguments of a handle, ours or another broker's; null if it is neither.
 const EntryList* readArguments(Arena& arena, const CMPIArgs* handle) {
   if (const ArgsObject* known = own<ArgsObject>(handle)) return &known->list;
   if (!isForeign(handle)) return nullptr;
@@ -337,7 +337,7 @@ CMPIContext* prepareAttachThread(const CMPIBroker* broker, const CMPIContext* co
   BrokerCore* core = BrokerCore::of(broker);
   const ContextObject* given = own<ContextObject>(context);
   if (core == nullptr || given == nullptr) return nullptr;
-  // The thread to be may be handed objects of the request, and make others part of them.
+  // The new thread may get objects of the request, and make others part of them.
   for (Scope* scope = Scope::current(); scope != nullptr; scope = scope->parent()) scope->share();
   return core->prepareThread(*given);
 }

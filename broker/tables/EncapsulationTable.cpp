@@ -11,13 +11,15 @@
 #include "broker/objects/Scope.h"
 #include "broker/objects/TableSupport.h"
 
-// CMPIBrokerEncFT: makes objects, in the innermost scope of the thread; names and shows them; messages and the log.
+// CMPIBrokerEncFT: makes objects in the innermost scope of the thread, names them, shows them as text, and handles
+// messages and the log.
 
 namespace zorva::broker {
 
 namespace {
 
-/// Where a call makes its object. On a thread that has no scope the call fails: the object would have no end.
+/// The arena in which a call makes its object. On a thread without a scope the call fails: the object would never be
+/// freed.
 Arena* arenaFor(const CMPIBroker* broker, CMPIStatus* status) noexcept {
   if (BrokerCore::of(broker) == nullptr) {
     setStatus(status, CMPI_RC_ERR_INVALID_HANDLE);
@@ -135,7 +137,7 @@ CMPIString* getType(const CMPIBroker* broker, const void* object, CMPIStatus* st
 /// The inserts of a message, each a type and a value as CMFmtArgs writes them.
 std::vector<std::string> inserts(CMPICount count, va_list arguments) {
   std::vector<std::string> texts;
-  // Past ten there is no placeholder; a count that is not true must not be believed.
+  // Placeholders go up to ten; a wrong count must not be trusted.
   for (CMPICount i = 0; i < count && i < 10; ++i) {
     switch (va_arg(arguments, int)) {
       case CMPI_sint32:
@@ -165,7 +167,7 @@ std::vector<std::string> inserts(CMPICount count, va_list arguments) {
         texts.emplace_back(textOf(va_arg(arguments, const CMPIString*)));
         break;
       default:
-        return texts;  // how long the value is, nobody knows: what follows cannot be read
+        return texts;  // the size of this value is unknown, so the following ones cannot be read
     }
   }
   return texts;
@@ -199,7 +201,7 @@ CMPIString* messageOf(const CMPIBroker* broker, const char* pattern, CMPIStatus*
   }
 }
 
-// There are no translations: every message is its default text.
+// There are no translations: every message has its default text.
 CMPIString* getMessage(const CMPIBroker* broker, const char* /*id*/, const char* defaultText, CMPIStatus* status,
                        CMPICount count, ...) {
   va_list arguments;
@@ -211,7 +213,7 @@ CMPIString* getMessage(const CMPIBroker* broker, const char* /*id*/, const char*
 
 CMPIString* getMessage2(const CMPIBroker* broker, const char* /*id*/, const CMPIMsgFileHandle file,
                         const char* defaultText, CMPIStatus* status, CMPICount count, ...) {
-  // openMessageFile gives no handle but the null one.
+  // openMessageFile returns only null handles.
   if (file != nullptr) return badHandle<CMPIString*>(status);
   va_list arguments;
   va_start(arguments, count);

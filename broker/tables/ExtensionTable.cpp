@@ -16,7 +16,7 @@ namespace zorva::broker {
 
 namespace {
 
-// A mutex or condition begins with a word that tells what it is, so that one is not taken for the other.
+// A mutex or condition begins with a word that names its kind, so that one is not taken for the other.
 constexpr std::uint64_t kMutexTag = 0x7a6f7276614d7478;
 constexpr std::uint64_t kConditionTag = 0x7a6f727661436e64;
 
@@ -46,7 +46,8 @@ static_assert(sizeof(pthread_t) == sizeof(void*));
 void* handleOf(pthread_t thread) noexcept { return reinterpret_cast<void*>(thread); }
 pthread_t threadOf(void* handle) noexcept { return reinterpret_cast<pthread_t>(handle); }
 
-// What a library is called on this system; the caller frees the text. A name that is a path or a file's already stays.
+// The file name of a library on this system; the caller frees the text. A path, or a name that is a file name already,
+// is not changed.
 char* resolveFileName(const char* name) {
   if (name == nullptr || *name == '\0') return nullptr;
   const std::string given(name);
@@ -102,7 +103,7 @@ int setThreadSpecific(CMPI_THREAD_KEY_TYPE key, void* value) {
   return pthread_setspecific(static_cast<pthread_key_t>(key), value);
 }
 
-// Recursive, since a provider may lock again in an up-call that comes back to it.
+// Recursive, because a provider may lock again in an up-call that calls it back.
 void* newMutex(int /*options*/) {
   auto* made = new (std::nothrow) Mutex;
   if (made == nullptr) return nullptr;

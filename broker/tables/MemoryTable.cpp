@@ -4,13 +4,13 @@
 #include "broker/objects/Scope.h"
 #include "broker/objects/TableSupport.h"
 
-// CMPIBrokerMemFT: memory that goes with the request.
+// CMPIBrokerMemFT: memory that is freed with the request.
 
 namespace zorva::broker {
 
 namespace {
 
-/// The scope that a call is about: the innermost of this thread, where the broker is ours.
+/// The scope of a call: the innermost of this thread, if the broker is ours.
 Scope* scopeOf(const CMPIBroker* broker) noexcept {
   return BrokerCore::of(broker) != nullptr ? Scope::current() : nullptr;
 }
@@ -68,7 +68,7 @@ void freeObject(const CMPIBroker* broker, typename Object::Handle* object) {
   }
 }
 
-// There are none here that could be freed.
+// This broker makes no such objects.
 void freeSelectExp(const CMPIBroker* /*broker*/, CMPISelectExp* /*expression*/) {}
 
 }  // namespace

@@ -18,8 +18,9 @@
 #include "broker/requests/Result.h"
 #include "broker/testing/TestClasses.h"
 
-// Every slot of every table is called: once with all that it wants, then with each pointer null in turn, then with each
-// object of another kind in turn. The list of slots comes from the facts about CMPI (generate_slot_test.py).
+// Every slot of every table is called: once with good arguments, then with each pointer null in turn, then with each
+// object replaced by one of another kind in turn. The list of slots comes from the facts about CMPI
+// (generate_slot_test.py).
 
 namespace zorva::broker {
 namespace {
@@ -43,7 +44,7 @@ Receiver& anyReceiver() {
   return receiver;
 }
 
-/// One object of each kind, and a value of each other type that a slot may want.
+/// One object of each kind, and a value of each other type that a slot may need.
 class World {
  public:
   World() : result(core, ResultObject::Instances | ResultObject::Paths | ResultObject::Values, &anyReceiver(), "test") {
@@ -96,7 +97,7 @@ class World {
   std::array<const char*, 2> list{"Name", nullptr};
 };
 
-/// What a text is good for where.
+/// A text that is valid for that parameter.
 const char* goodText(const std::string& slot, const std::string& parameter) {
   if (slot == "CMPIContextFT.getEntry" || slot == "CMPIContextFT.addEntry") return CMPIPrincipal;
   if (slot == "CMPIArgsFT.getArg") return "Text";
@@ -213,7 +214,7 @@ template <class T>
 T* wrongKind(World& world) {
   void* other = std::is_same_v<std::remove_const_t<T>, CMPIString> ? static_cast<void*>(world.path)
                                                                    : static_cast<void*>(world.string);
-  // A broker is larger than the other objects; what is none must still be as large to be looked at.
+  // A broker is larger than the other objects; the wrong object must be as large, because it is read.
   static CMPIBroker noBroker{};
   noBroker.hdl = &noBroker;
   if (std::is_same_v<std::remove_const_t<T>, CMPIBroker>) other = &noBroker;
@@ -222,7 +223,7 @@ T* wrongKind(World& world) {
 
 enum class Variant { Null, WrongKind };
 
-/// What a call told: a code, where it has a way to tell one.
+/// What a call returned: a code, if it can return one.
 struct Told {
   bool tells = false;
   CMPIrc rc = CMPI_RC_OK;
@@ -239,13 +240,13 @@ Told callWith(World& world, R (*function)(Args...), std::tuple<Args...>& argumen
   } else {
     [[maybe_unused]] R given = std::apply(function, arguments);
     if constexpr (std::is_pointer_v<R> && isHandle<std::remove_pointer_t<R>>) {
-      if (given != nullptr) given->ft->release(given);  // a clone must be; for all else it is harmless
+      if (given != nullptr) given->ft->release(given);  // a clone must be released; for all else it is harmless
     }
     return {hasStatus, world.status.rc};
   }
 }
 
-/// Slots whose handle is optional: a text beside it says the same.
+/// Slots whose handle is optional: a text parameter has the same meaning.
 bool isOptional(const std::string& slot, const std::string& parameter) {
   return parameter == "string" && (slot == "CMPIBrokerEncFT.logMessage" || slot == "CMPIBrokerEncFT.trace");
 }
@@ -292,7 +293,7 @@ void exercise(const std::string& slot, R (*function)(Args...), std::array<std::s
   all(std::index_sequence_for<Args...>(), Variant::WrongKind);
 }
 
-// Where the tables stand, by the names of their types.
+// The tables, by the names of their types.
 auto& tableOf(const CMPIBrokerFT*) { return brokerTable; }
 auto& tableOf(const CMPIBrokerEncFT*) { return encapsulationTable; }
 auto& tableOf(const CMPIBrokerExtFT*) { return extensionTable; }
@@ -312,7 +313,7 @@ auto& tableOf(const CMPIArrayFT*) { return ArrayObject::table; }
 auto& tableOf(const CMPIEnumerationFT*) { return EnumerationObject::table; }
 auto& tableOf(const CMPIDateTimeFT*) { return DateTimeObject::table; }
 
-/// Slots that end threads or wait, or want a thread of their own: Threads_test.cpp calls each of them.
+/// Slots that end threads, wait, or need their own thread: Threads_test.cpp calls each of them.
 const std::set<std::string>& calledInThreadsTest() {
   static const std::set<std::string> slots = {
       "CMPIBrokerFT.attachThread",         "CMPIBrokerFT.detachThread",        "CMPIBrokerExtFT.resolveFileName",

@@ -8,12 +8,12 @@
 #include "cmpift.h"
 #include "cmpimacs.h"
 
-// A provider library for the tests of the broker: it serves the classes of TestClasses.h, well or badly as they ask,
-// and writes what it was handed to the broker's log.
+// A provider library for the tests of the broker: it serves the classes of TestClasses.h, correctly or with the errors
+// that a test asks for, and writes its arguments to the broker's log.
 
 namespace {
 
-// Several providers share it, and each may be made while another runs.
+// Several providers share it, and one may be made while another runs.
 std::atomic<const CMPIBroker*> retained = nullptr;
 const CMPIBroker* broker() { return retained.load(); }
 
@@ -91,14 +91,15 @@ CMPIInstance* instanceOf(const CMPIObjectPath* like, const char* className, cons
   return instance;
 }
 
-// What of the thing "a" can be modified, until the broker ends.
+// The modifiable properties of the thing "a", until the broker ends.
 struct ThingA {
   bool hasSize = true;
   CMPIUint16 size = 7;
   std::vector<std::string> labels = {"x", "y"};
 };
 std::mutex thingMutex;
-// Never destroyed: a broker that ends with the process cleans its providers up after the library's own objects.
+// Never destroyed: if the broker ends with the process, it cleans up its providers after the library's static objects
+// are destroyed.
 ThingA& thingA = *new ThingA;
 
 CMPIStatus cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
@@ -107,7 +108,7 @@ CMPIStatus cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
   return kOk;
 }
 
-/// The thing "stubborn" takes every modification and stays as it is.
+/// The thing "stubborn" accepts every modification and changes nothing.
 CMPIInstance* thingOf(const CMPIObjectPath* path, const std::string& name, const char** properties) {
   CMPIInstance* instance = instanceOf(path, "T_Thing", name, properties);
   if (name != "a") return instance;
@@ -122,7 +123,7 @@ CMPIStatus methodCleanup(CMPIMethodMI*, const CMPIContext*, CMPIBoolean) {
   return {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
 }
 
-// ---- Things: what a good provider does ----
+// ---- Things: a correct provider ----
 
 CMPIStatus thingNames(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                       const CMPIObjectPath* path) {
@@ -132,7 +133,7 @@ CMPIStatus thingNames(CMPIInstanceMI*, const CMPIContext* context, const CMPIRes
     result->ft->returnObjectPath(result, pathOf(path, "T_Thing", "a"));
     result->ft->returnObjectPath(result, pathOf(path, "t_thing", "b"));
   }
-  // Also when asked for the superclass, as some providers do.
+  // Also for the superclass, as some providers do.
   result->ft->returnObjectPath(result, pathOf(path, "T_SpecialThing", "s"));
   return kOk;  // without returnDone
 }
@@ -157,7 +158,7 @@ CMPIStatus thing(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* 
        ((principal.state & CMPI_nullValue) == 0 ? text(principal.value.string) : "nobody"));
   const std::string name = nameOf(path);
   if (name != "a" && name != "b" && name != "stubborn") return kOk;
-  // This provider pays no heed to the property list: the broker must.
+  // This provider ignores the property list, so the broker must apply it.
   result->ft->returnInstance(result, thingOf(path, name, nullptr));
   return kOk;
 }
@@ -235,7 +236,7 @@ CMPIStatus invoke(CMPIMethodMI*, const CMPIContext*, const CMPIResult* result, c
 
 CMPIMethodMIFT methodTable = {CMPICurrentVersion, CMPICurrentVersion, "methodThing", methodCleanup, invoke};
 
-// ---- Trouble: what bad providers do, by the name that is asked for ----
+// ---- Trouble: provider errors, selected by the requested name ----
 
 CMPIStatus troubleNames(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result, const CMPIObjectPath* path) {
   result->ft->returnObjectPath(result, pathOf(path, "T_Trouble", "one"));
@@ -432,7 +433,7 @@ CMPIStatus referenceNames(CMPIAssociationMI*, const CMPIContext*, const CMPIResu
   note("ReferenceNames " + shown(path) + " " + shown(resultClass) + " " + shown(role));
   CMPIInstance* link = linkOf(path);
   CMPIObjectPath* name = link->ft->getObjectPath(link, nullptr);
-  // Some providers name their associations by the class of a sister association.
+  // Some providers name their associations by the class of a sibling association.
   if (nameOf(path) == "sister") name->ft->setClassName(name, "T_ThingTrouble");
   result->ft->returnObjectPath(result, name);
   return kOk;
