@@ -19,7 +19,7 @@ namespace {
 struct End {
   std::uint8_t family = 0;
   std::uint16_t port = 0;      ///< in network order
-  std::uint32_t address[4]{};  ///< an IPv4 address takes the first
+  std::uint32_t address[4]{};  ///< an IPv4 address is in the first
 };
 
 End endOf(const sockaddr_storage& address) {

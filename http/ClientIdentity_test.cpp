@@ -20,7 +20,7 @@ sockaddr_in loopback(const char* address) {
   return name;
 }
 
-/// Listens, and says whose a connection is.
+/// Listens, and reports the client of a connection.
 class Host {
  public:
   Host() : socket_(::socket(AF_INET, SOCK_STREAM, 0)) {

@@ -26,7 +26,7 @@ std::string seconds(milliseconds time) {
   return std::to_string(tenths / 10) + (tenths % 10 == 0 ? "" : "." + std::to_string(tenths % 10)) + " s";
 }
 
-/// Why a connection in that phase must end; empty: it need not.
+/// Why a connection in that phase must end; empty if it need not.
 std::string overdue(Phase phase, milliseconds time, const HttpLimits& limits) {
   switch (phase) {
     case Phase::Idle:
@@ -41,8 +41,7 @@ std::string overdue(Phase phase, milliseconds time, const HttpLimits& limits) {
   return {};
 }
 
-/// The HTTP library waits for more where the end of a connection came together with its last bytes: nothing tells it a
-/// second time.
+/// If a connection ends together with its last bytes, the HTTP library is not notified again and waits for more.
 bool hasHungUp(int socket) {
   pollfd look{socket, POLLRDHUP, 0};
   return ::poll(&look, 1, 0) > 0;
@@ -74,7 +73,7 @@ void Connections::add(int socket, std::string peer, std::string client) {
 
 std::shared_ptr<Connection> Connections::find(int socket) const {
   const std::lock_guard lock(mutex_);
-  // It came a moment ago.
+  // Searched from the end: the connection was added a moment ago.
   const auto found = std::find_if(connections_.rbegin(), connections_.rend(),
                                   [&](const auto& each) { return each->socket_ == socket; });
   return found == connections_.rend() ? nullptr : *found;

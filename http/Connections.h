@@ -11,16 +11,16 @@
 
 #include "http/HttpLimits.h"
 
-// Who is connected, what each connection is busy with and since when: the table by which slow and silent clients are
-// found and cut off. Thread-safe.
+// The table of connections, with the phase of each one and its start. It serves to find and cut off slow and silent
+// clients. Thread-safe.
 
 namespace zorva::http {
 
 enum class Phase : std::uint8_t {
   Idle,      ///< between requests
   Arriving,  ///< a request is coming in
-  Working,   ///< it is with a provider
-  Sending,   ///< its response goes out; the time is that of the last piece
+  Working,   ///< a provider works on it
+  Sending,   ///< its response is being sent; the time is that of the last piece
 };
 
 /// One connection. `socket` belongs to the HTTP library, which closes it; here it is only shut down.
@@ -30,16 +30,16 @@ class Connection {
 
   const std::string& peer() const noexcept { return peer_; }
 
-  /// Whose connection it is: see clientOf().
+  /// The client of the connection: see clientOf().
   const std::string& client() const noexcept { return client_; }
 
-  /// Enters a phase, or tells that something happened in it. A phase and its time are always read together.
+  /// Enters a phase, or notes that something happened in it. A phase and its time are always read together.
   void enter(Phase phase) noexcept;
 
   Phase phase() const noexcept { return static_cast<Phase>(state_.load(std::memory_order_relaxed) & 3); }
   std::chrono::milliseconds inPhase() const noexcept;
 
-  /// It has had a request answered: such a client gives way last.
+  /// The client got a response: such a client is cut off last to make room.
   void prove() noexcept { proven_.store(true, std::memory_order_relaxed); }
   bool isProven() const noexcept { return proven_.load(std::memory_order_relaxed); }
 
@@ -62,36 +62,36 @@ class Connection {
 
 class Connections {
  public:
-  /// Before the socket is handed to the HTTP library.
+  /// Call it before the socket is passed to the HTTP library.
   void add(int socket, std::string peer, std::string client);
 
-  /// The one that was added for a socket, which is open.
+  /// The connection with that open socket.
   std::shared_ptr<Connection> find(int socket) const;
 
-  /// Before the socket is closed: it is not touched afterwards.
+  /// Call it before the socket is closed: the socket is not used afterwards.
   void remove(Connection& connection);
 
-  /// Those that are not cut.
+  /// The connections that are not cut off.
   std::size_t count() const;
 
-  /// Those in a phase.
+  /// The connections in a phase.
   std::size_t countIn(Phase phase) const;
 
-  /// Cuts off who has taken longer than the limits allow, and who has gone unnoticed.
+  /// Cuts off connections that have exceeded the limits, or whose end was not noticed.
   void sweep(const HttpLimits& limits);
 
-  /// Cuts off one that waits or sends its request, to make room: first one that has never had an answer, of those the
-  /// one that has been at it for longest. False where every connection has a request in work.
+  /// Cuts off one connection that is idle or sends its request, to make room: first those that never got a response, of
+  /// these the one that is in its phase for longest. False if every connection has a request in work.
   bool cutIdlest();
 
-  /// Cuts off the one that holds part of a body for longest.
+  /// Cuts off the connection that has held part of a body for longest.
   void cutSlowestBody();
 
-  /// Shuts a connection down, so that the HTTP library ends it as if the client had gone.
+  /// Shuts a connection down, so that the HTTP library ends it as if the client had closed it.
   void cut(Connection& connection, const std::string& why);
 
  private:
-  /// Without a reason, nothing is logged.
+  /// Logs nothing if the reason is empty.
   void cutLocked(Connection& connection, const std::string& why);
 
   mutable std::mutex mutex_;

@@ -8,26 +8,26 @@
 #include <utility>
 #include <vector>
 
-// What passes between the HTTP side of the server and its CIM side: a request that arrived whole, and the place where
-// its response goes piece by piece (DSP0200 1.4).
+// The interface between the server's HTTP side and its CIM side: a complete request, and a sink that takes the response
+// piece by piece (DSP0200 1.4).
 
 namespace zorva::http {
 
 /// HTTP header fields in the order in which they came; names in any case.
 using HeaderList = std::vector<std::pair<std::string, std::string>>;
 
-/// A request as HTTP delivered it, its transfer and content codings undone.
+/// A request with its transfer and content codings decoded.
 struct HttpRequest {
   std::string method;  ///< POST or M-POST
   std::string path;
   HeaderList headers;
   std::string body;
   bool takesTrailers = false;  ///< the client said TE: trailers
-  std::string client = {};     ///< who sent it, for what is limited by client
+  std::string client = {};     ///< the client, for limits per client
   std::string peer = {};       ///< the client's address and port
 };
 
-/// Thrown by ResponseSink::write when the client has gone: nobody waits for the rest.
+/// Thrown by ResponseSink::write if the client has closed the connection: nothing reads the rest.
 class ClientGone : public std::runtime_error {
  public:
   using std::runtime_error::runtime_error;
@@ -35,7 +35,7 @@ class ClientGone : public std::runtime_error {
 
 class ResponseSink;
 
-/// Writes the answer to a request that is given up, for the reason `why`. It holds what it needs of the request.
+/// Writes the response of a request that is abandoned, for the reason `why`. It owns what it needs of the request.
 using LateAnswer = std::function<void(const std::string& why, ResponseSink& sink)>;
 
 /// Takes the response to one request. Used by one thread at a time.
@@ -43,22 +43,24 @@ class ResponseSink {
  public:
   virtual ~ResponseSink() = default;
 
-  /// The HTTP status and the header fields of the response; once, before anything else. Content-Type comes with
-  /// `headers`; what belongs to HTTP itself (Date, Content-Length, Transfer-Encoding, Connection) does not.
+  /// The HTTP status and the header fields of the response; call it once, before anything else. `headers` contains
+  /// Content-Type, but not the fields that belong to HTTP itself (Date, Content-Length, Transfer-Encoding, Connection).
   virtual void begin(int status, const HeaderList& headers) = 0;
 
-  /// A further piece of the body. Blocks while too much of the response is unsent. Throws ClientGone.
+  /// Another piece of the body. Blocks while too much of the response is unsent. Throws ClientGone.
   virtual void write(std::string_view text) = 0;
 
-  /// After begin: the operation failed, with a CIM status code, although its response has begun. It is told in trailers
-  /// to a client that takes them; else the connection is closed before the body is complete. Nothing is written after.
+  /// Call it after begin if the operation failed, with a CIM status code. The failure is reported in trailers to a
+  /// client that accepts them; else the connection is closed before the body is complete. Write nothing afterwards.
   virtual void fail(std::uint32_t cimStatus, std::string_view description) = 0;
 
-  /// Before begin: what answers should the work be given up. It runs on the thread that gives up, so it must be quick:
-  /// in no case does it read the body again. Without one the answer is an HTTP status.
+  /// Call it before begin to set the response for the case that the request is abandoned. The function runs on the
+  /// thread that abandons the request, so it must be quick and must not read the body again. Without it the response is
+  /// an HTTP status.
   virtual void setLateAnswer(LateAnswer) {}
 
-  /// False: nobody waits for the response any more, and the work may end. For work that would not notice otherwise.
+  /// False if the client no longer waits for the response and the work may end. For work that would not notice
+  /// otherwise.
   virtual bool isWanted() const { return true; }
 
   /// True once begin was called.

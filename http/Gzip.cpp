@@ -12,7 +12,7 @@ constexpr std::size_t kStep = 16384;
 
 }  // namespace
 
-// The lowest level makes CIM-XML a tenth of its size; higher ones cost several times as much for little.
+// The lowest level reduces CIM-XML to a tenth of its size; higher levels cost several times as much and gain little.
 Gzip::Gzip() {
   const int rc = deflateInit2(&stream_, Z_BEST_SPEED, Z_DEFLATED, kGzipWindow, kMemory, Z_DEFAULT_STRATEGY);
   if (rc != Z_OK) throw std::bad_alloc();

@@ -5,7 +5,7 @@
 #include <string>
 #include <string_view>
 
-// A response that is compressed while it grows (RFC 1952).
+// A response that is compressed while it is written (RFC 1952).
 
 namespace zorva::http {
 
@@ -17,10 +17,10 @@ class Gzip {
   Gzip(const Gzip&) = delete;
   Gzip& operator=(const Gzip&) = delete;
 
-  /// Appends to `out` what is ready of the text so far.
+  /// Appends to `out` the compressed text that is ready so far.
   void add(std::string_view text, std::string& out) { run(text, out, Z_NO_FLUSH); }
 
-  /// Appends the rest. Nothing comes after.
+  /// Appends the rest. Add nothing afterwards.
   void finish(std::string& out) { run({}, out, Z_FINISH); }
 
  private:

@@ -13,7 +13,7 @@ constexpr std::size_t kWorthWaking = std::size_t{32} << 10;
 constexpr std::size_t kWorthCompressing = 1024;
 constexpr std::size_t kBlock = std::size_t{16} << 10;
 
-/// The processor time that a thread has used; nothing where the thread is no more.
+/// The processor time that a thread has used; nothing if the thread has ended.
 std::optional<HttpExchange::Clock::duration> processorTime(clockid_t clock) {
   timespec used{};
   if (::clock_gettime(clock, &used) != 0) return std::nullopt;
@@ -125,7 +125,7 @@ void HttpExchange::append(std::string_view text) {
 
 void HttpExchange::startStreaming() {
   streaming_ = true;
-  // They change places, and neither has to grow on the way.
+  // Both have the same capacity, so they can be swapped and neither has to grow.
   held_.reserve(kMostHeld + kWhole);
   outgoing_.reserve(kMostHeld + kWhole);
   if (takesGzip) {
@@ -137,7 +137,7 @@ void HttpExchange::startStreaming() {
   publish();
 }
 
-// No more than one thread is ever behind the lock here, the one that works on this request.
+// At most one thread waits here: the one that works on this request.
 void HttpExchange::waitForClient(std::unique_lock<std::mutex>& lock) {
   if (held_.size() < kMostHeld || gone_ || givenUp_) return;
   waitingSince_ = Clock::now();
@@ -268,7 +268,7 @@ MHD_Response* HttpExchange::makeResponse() {
   if (streaming_) {
     return MHD_create_response_from_callback(MHD_SIZE_UNKNOWN, kBlock, &HttpExchange::fillResponse, this, nullptr);
   }
-  // Nobody adds to it any more, and it lives until the HTTP library is done.
+  // No writer adds to it any more, and it lives until the HTTP library is done.
   bytesSent_ = held_.size();
   return MHD_create_response_from_buffer(held_.size(), held_.data(), MHD_RESPMEM_PERSISTENT);
 }

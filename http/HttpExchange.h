@@ -19,16 +19,16 @@
 #include "http/Gzip.h"
 #include "http/RequestHead.h"
 
-// One request and its response, between the event thread that owns the connection and the worker that answers.
+// One request and its response, shared by the event thread that owns the connection and the worker that answers.
 //
-// The connection is suspended while the worker computes. A response that ends below kWhole bytes goes out in one piece
-// with its length; a longer one is streamed in chunks: the worker fills `held_`, the event thread empties `outgoing_`
-// and exchanges the two. The worker waits while it is more than kMostHeld ahead, so no more than a few times that is
-// ever unsent.
+// The connection is suspended while the worker computes. A response shorter than kWhole bytes is sent in one piece with
+// its length. A longer one is streamed in chunks: the worker fills `held_`, the event thread empties `outgoing_` and
+// swaps the two. The worker waits while it is more than kMostHeld ahead, so the unsent part is never more than a few
+// times that size.
 
 namespace zorva::http {
 
-/// Told by an exchange when its worker begins and ends to wait for the client.
+/// Called by an exchange when its worker begins and ends to wait for the client.
 class WaitListener {
  public:
   virtual ~WaitListener() = default;
@@ -46,7 +46,7 @@ class HttpExchange final : public ResponseSink {
   HttpExchange(MHD_Connection* connection, std::shared_ptr<Connection> client, std::string path);
 
   HttpRequest request;
-  std::optional<Refusal> refusal;  ///< answered in place of the work
+  std::optional<Refusal> refusal;  ///< the response, if no work is needed
   bool headIsRead = false;
   bool takesGzip = false;
   bool isHttp11 = true;
@@ -54,16 +54,17 @@ class HttpExchange final : public ResponseSink {
 
   // ---- The event thread ----
 
-  /// Lets the connection rest until there is a response. Before the work may begin: then neither waits for the other.
+  /// Suspends the connection until there is a response. Call it before the work may begin: then neither waits for the
+  /// other.
   void suspend();
 
   /// Whether respond() may be called: there is a response, or its beginning.
   bool isPublished() const;
 
-  /// Hands the response to the HTTP library.
+  /// Passes the response to the HTTP library.
   MHD_Result respond();
 
-  /// The HTTP library is done with the request. The worker, where it still runs, gets ClientGone.
+  /// The HTTP library is done with the request. A worker that still runs gets ClientGone.
   void ended();
 
   int status() const noexcept { return status_; }
@@ -72,7 +73,7 @@ class HttpExchange final : public ResponseSink {
 
   // ---- The worker ----
 
-  /// The work begins; `waits` lives longer than the work.
+  /// The work begins; `waits` outlives the work.
   void start(WaitListener& waits);
 
   void begin(int status, const HeaderList& headers) override;
@@ -82,26 +83,26 @@ class HttpExchange final : public ResponseSink {
   void setLateAnswer(LateAnswer answer) override;
   bool isWanted() const override;
 
-  /// The work is done. Where it wrote nothing, `orElse` is the answer.
+  /// The work is done. If it wrote nothing, `orElse` is the response.
   void finish(const Refusal& orElse);
 
   // ---- Any thread ----
 
-  /// For how long the work has run, without the time in which it waited for the client; 0 where it has not begun.
+  /// How long the work has run, without the time in which it waited for the client; 0 if it has not begun.
   Clock::duration worked() const;
 
-  /// For how long it has been waiting for the client now.
+  /// How long it has been waiting for the client now.
   Clock::duration waiting() const;
 
-  /// True where the work has run for a while and its thread has used next to no processor time for it, or it has run
-  /// for long: it waits for something that is not its client.
+  /// True if the work waits for something other than its client: it has run for a while and its thread has used almost
+  /// no processor time for it, or it has run for long.
   bool hangs() const;
 
-  /// Gives the work up. Where nothing of a response was sent yet, the late answer that was set is the response, else
+  /// Abandons the work. If nothing of a response was sent yet, the late answer that was set is the response, else
   /// `orElse`. Later results are dropped. False: the work was done.
   bool giveUp(const Refusal& orElse);
 
-  std::size_t place = 0;  ///< in the list of who owns it, under that one's lock
+  std::size_t place = 0;  ///< in the owner's list, guarded by the owner's lock
 
  private:
   void takeLateAnswer(const Refusal& orElse);
@@ -119,8 +120,8 @@ class HttpExchange final : public ResponseSink {
 
   MHD_Connection* const connection_;
   const Clock::time_point arrived_ = Clock::now();
-  MHD_Response* response_ = nullptr;  ///< the event thread's
-  std::string outgoing_;              ///< the event thread's, while it streams
+  MHD_Response* response_ = nullptr;  ///< used by the event thread
+  std::string outgoing_;              ///< used by the event thread, while it streams
   std::size_t taken_ = 0;             ///< of outgoing_
   std::uint64_t bytesSent_ = 0;
 
@@ -137,23 +138,23 @@ class HttpExchange final : public ResponseSink {
   bool streaming_ = false;
   bool suspended_ = false;  ///< the connection awaits wake()
   bool complete_ = false;   ///< nothing is added any more
-  bool gone_ = false;       ///< nobody takes the response
+  bool gone_ = false;       ///< the client has closed the connection
   bool givenUp_ = false;
   bool failed_ = false;
   std::uint32_t cimStatus_ = 0;
   std::string description_;
   LateAnswer lateAnswer_;
-  std::optional<Clock::time_point> started_;  ///< moved on by the time spent waiting
+  std::optional<Clock::time_point> started_;  ///< moved forward by the time spent waiting for the client
   std::optional<clockid_t> processorClock_;   ///< of the thread that does the work
   Clock::duration processorAtStart_{};
   std::optional<Clock::time_point> waitingSince_;
 };
 
-/// The response of a refusal: its reason as text, and the header fields that belong to it.
+/// The response header fields of a refusal; its reason is the body.
 HeaderList headersOf(const Refusal& refusal);
 std::string textOf(const Refusal& refusal);
 
-/// Adds a header field to a response. The HTTP library takes no empty value; a blank is one (RFC 9110 5.5).
+/// Adds a header field to a response. The HTTP library refuses an empty value; a blank means the same (RFC 9110 5.5).
 void addHeader(MHD_Response& response, const std::string& name, const std::string& value);
 
 /// Queues the response of a refusal for a connection, which is closed after it.

@@ -3,7 +3,7 @@
 #include <chrono>
 #include <cstddef>
 
-// What one client, and all of them together, may ask of the server.
+// The limits on one client, and on all clients together.
 
 namespace zorva::http {
 
@@ -11,14 +11,14 @@ struct HttpLimits {
   std::size_t bodyBytes = std::size_t{4} << 20;     ///< of one request
   std::size_t bodiesBytes = std::size_t{64} << 20;  ///< of all requests together that are still arriving
   std::size_t headerBytes = std::size_t{32} << 10;  ///< request line and header fields of one request
-  std::size_t connections = 1000;                   ///< open at once; a further one takes the place of the idlest
-  std::size_t requests = 256;                       ///< in work at once, those that wait for a worker included
-  std::size_t workers = 32;                         ///< requests that run at once; what waits for its client is not one
+  std::size_t connections = 1000;  ///< open at once; a new one replaces the one that is idle for longest
+  std::size_t requests = 256;      ///< in work at once, including those that wait for a worker
+  std::size_t workers = 32;        ///< requests that run at once, without those that wait for their client
 
   std::chrono::milliseconds arrival{30'000};   ///< from the first line of a request to the end of its body
   std::chrono::milliseconds idle{60'000};      ///< between two requests of a connection
   std::chrono::milliseconds provider{60'000};  ///< for the work on a request, without waiting for the client
-  std::chrono::milliseconds client{20'000};    ///< for a client that takes nothing of its response
+  std::chrono::milliseconds client{20'000};    ///< for a client that reads nothing of its response
   std::chrono::milliseconds drain{10'000};     ///< for running requests when the server ends
 
   bool gzip = true;  ///< responses are compressed for clients that accept it

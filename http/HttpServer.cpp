@@ -28,7 +28,7 @@ namespace zorva::http {
 
 namespace {
 
-/// What the HTTP library keeps for a request.
+/// What the HTTP library stores for a request.
 using Holder = std::shared_ptr<HttpExchange>;
 
 std::shared_ptr<Connection> connectionOf(MHD_Connection* connection) {
@@ -59,7 +59,7 @@ class HttpServer::Core {
   std::size_t requestsTaken() const { return requests_.load(std::memory_order_relaxed); }
 
  private:
-  // What the HTTP library calls.
+  // Called by the HTTP library.
   static MHD_Result onRequest(void* core, MHD_Connection* connection, const char* url, const char* method,
                               const char* version, const char* data, std::size_t* size, void** holder);
   static void* onRequestLine(void* core, const char* uri, MHD_Connection* connection);
@@ -97,7 +97,7 @@ HttpServer::Core::Core(const HttpLimits& limits, int threads, Handler handler, s
 void HttpServer::Core::startDaemon(int threads) {
   constexpr unsigned kFlags =
       MHD_USE_EPOLL_INTERNAL_THREAD | MHD_USE_NO_LISTEN_SOCKET | MHD_ALLOW_SUSPEND_RESUME | MHD_USE_ERROR_LOG;
-  // take() counts the connections; those that are cut and not yet closed must not keep new ones out.
+  // take() counts the connections; connections that are cut off and not yet closed must not keep new ones out.
   constexpr unsigned kMostConnections = 1U << 20;
   // Strings are compared by the header's rules for each: strict where leniency would let requests be smuggled.
   constexpr int kStrict = 1;
@@ -137,7 +137,7 @@ void HttpServer::Core::take(int socket, const sockaddr_storage& peer, socklen_t 
     ::close(socket);
     return;
   }
-  // From here on, since the library tells of it later, on a thread of its own.
+  // Added here because the library reports a new connection later, on its own thread.
   connections_.add(socket, addressText(peer), clientOf(socket, peer));
   if (MHD_add_connection(daemon_, socket, reinterpret_cast<const sockaddr*>(&peer), peerSize) != MHD_YES) {
     ZORVA_LOG_CLIENT(Error, addressText(peer) + ": refused: " + std::strerror(errno));
@@ -170,7 +170,7 @@ bool HttpServer::Core::stop() {
   return workers_.join(kLastAnswers);
 }
 
-// ---- What the HTTP library calls ----
+// ---- Called by the HTTP library ----
 
 void HttpServer::Core::onConnection(void* core, MHD_Connection* connection, void** context,
                                     MHD_ConnectionNotificationCode code) {
@@ -251,13 +251,13 @@ void HttpServer::Core::readBody(HttpExchange& exchange, std::string_view data) {
   if (bodies_.fetch_add(data.size()) + data.size() > now.bodiesBytes) connections_.cutSlowestBody();
 }
 
-/// Its body counts as unfinished no more.
+/// Its body no longer counts as unfinished.
 void HttpServer::Core::releaseBody(HttpExchange& exchange) {
   bodies_ -= exchange.client->held();
   exchange.client->hold(0);
 }
 
-/// What needs no worker.
+/// Requests that need no worker.
 bool HttpServer::Core::answersAtOnce(HttpExchange& exchange) const {
   const HttpRequest& request = exchange.request;
   if (request.method == "OPTIONS") {

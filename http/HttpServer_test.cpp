@@ -1,4 +1,4 @@
-// The HTTP side with handlers that the tests make, over real connections.
+// The HTTP side with the tests' own handlers, over real connections.
 #include "http/HttpServer.h"
 
 #include <gmock/gmock.h>
@@ -26,7 +26,7 @@ using testing::WireResponse;
 
 const HeaderList kXml{{"Content-Type", "application/xml; charset=\"utf-8\""}};
 
-/// A text of that size that does not repeat itself at once.
+/// A text of that size without short repetitions.
 std::string longText(std::size_t size) {
   std::string text;
   for (std::size_t i = 0; text.size() < size; ++i) text += std::to_string(i * 7919) + "\n";
@@ -34,7 +34,7 @@ std::string longText(std::size_t size) {
   return text;
 }
 
-/// Something that handlers wait for.
+/// A gate at which handlers wait.
 class Gate {
  public:
   void open() {
@@ -192,7 +192,7 @@ TEST(HttpServer, NoMoreThanAMebibyteIsEverUnsent) {
   });
   Wire wire(server.port(), 4096);
   ASSERT_TRUE(wire.send(testing::posting("x")));
-  // What the kernel holds for the client comes on top of what the server does.
+  // The kernel holds data for the client in addition to the server.
   constexpr std::size_t kKernel = std::size_t{6} << 20;
   std::size_t before = 1;
   while (before != written) {

@@ -26,7 +26,7 @@ constexpr int kPortTries = 20;
 
 std::string errorText(int error) { return std::generic_category().message(error); }
 
-/// What the address and port are as the kernel takes them; none where the text is no address.
+/// The address and port in the kernel's form; nothing if the text is no address.
 std::optional<sockaddr_storage> parse(const std::string& text, int port) {
   sockaddr_storage storage{};
   in_addr v4{};
@@ -87,11 +87,11 @@ sockaddr_storage nameOf(int socket) {
 
 int portOf(const sockaddr_storage& address) {
   sockaddr_in v4{};
-  std::memcpy(&v4, &address, sizeof v4);  // the port stands at the same place in both families
+  std::memcpy(&v4, &address, sizeof v4);  // the port is at the same offset in both families
   return ntohs(v4.sin_port);
 }
 
-/// Listens on one address. The descriptor is empty and errno tells why where that fails.
+/// Listens on one address. On a failure the descriptor is empty and errno has the reason.
 Listener listenOnOne(const sockaddr_storage& address) {
   Listener listener;
   const int socket = ::socket(address.ss_family, SOCK_STREAM | SOCK_NONBLOCK | SOCK_CLOEXEC, 0);
@@ -107,7 +107,7 @@ Listener listenOnOne(const sockaddr_storage& address) {
   return listener;
 }
 
-/// One try at all addresses. Empty where a port that was chosen for the first is taken at another.
+/// One try at all addresses. Empty if a port that was chosen for the first is in use at another.
 std::vector<Listener> listenOnce(const Addresses& addresses, int port, bool mayLack) {
   std::vector<Listener> listeners;
   int chosen = port;

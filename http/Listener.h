@@ -4,8 +4,8 @@
 #include <string>
 #include <vector>
 
-// The sockets on which the server waits for clients. This server asks nobody who they are, so it listens on loopback
-// addresses and on no other: 127.0.0.0/8 and ::1.
+// The sockets on which the server waits for clients. The server does not authenticate clients, so it listens only on
+// loopback addresses: 127.0.0.0/8 and ::1.
 
 namespace zorva::http {
 
@@ -35,15 +35,16 @@ struct Listener {
   std::string url;  ///< "http://127.0.0.1:5988"
 };
 
-/// Refuses what is no loopback address. Throws std::invalid_argument with a sentence that names the address.
+/// Refuses an address that is not a loopback address. Throws std::invalid_argument with a sentence that names the
+/// address.
 void checkAddresses(const Addresses& addresses);
 
-/// Listens on these addresses, all on the same port; port 0 chooses one. Where no addresses are given, on 127.0.0.1 and
-/// ::1, and a host without one of them gets by with the other. Throws std::runtime_error with a sentence.
+/// Listens on these addresses, all on the same port; port 0 chooses a free one. Without addresses it listens on
+/// 127.0.0.1 and ::1; if the host lacks one of them, on the other only. Throws std::runtime_error with a sentence.
 std::vector<Listener> listenOn(const std::optional<Addresses>& addresses, int port);
 
 /// Takes over sockets that this process was started with (descriptors 3 and up, sd_listen_fds(3)). Throws
-/// std::runtime_error where one of them does not listen, or listens elsewhere than on loopback.
+/// std::runtime_error if one of them does not listen, or its address is not a loopback address.
 std::vector<Listener> adoptListeners(int count);
 
 }  // namespace zorva::http

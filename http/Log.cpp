@@ -26,7 +26,7 @@ void writeLine(int level, const std::string& text, const char* function, const c
 /// Counts lines second by second.
 class Flood {
  public:
-  /// Whether this line may be written. `missed` is how many before it could not, told once.
+  /// Whether this line may be written. `missed` is the number of lines dropped before it, reported once.
   bool admits(Clock::time_point now, int& missed) {
     const std::lock_guard lock(mutex_);
     missed = 0;
@@ -56,7 +56,7 @@ void setLogLevel(int level) {
 void logLine(Level level, const std::string& text, const char* function, const char* file, int line) noexcept try {
   if (isLogged(level)) writeLine(static_cast<int>(level), text, function, file, line);
 } catch (...) {
-  // Lost, as a line that cannot be written.
+  // The line is lost, like any line that cannot be written.
 }
 
 void logClientLine(Level level, const std::string& text, const char* function, const char* file, int line) noexcept
@@ -71,7 +71,7 @@ void logClientLine(Level level, const std::string& text, const char* function, c
   }
   if (admitted) writeLine(static_cast<int>(level), text, function, file, line);
 } catch (...) {
-  // Lost, as a line that cannot be written.
+  // The line is lost, like any line that cannot be written.
 }
 
 }  // namespace zorva::http

@@ -2,26 +2,26 @@
 
 #include <string>
 
-// The server's lines in the agent's log, which is where the providers of the process write theirs. Thread-safe; nothing
-// here throws.
+// The server's lines in the agent's log, to which the providers of the process write too. Thread-safe; nothing here
+// throws.
 
 namespace zorva::http {
 
 /// On the scale of the agent's levels.
 enum class Level : int {
-  Request = 4500,  ///< a line for each request; what the providers tell about their work lies below
-  Change = 5000,   ///< who has changed what
+  Request = 4500,  ///< a line for each request; the providers' lines about their work have lower levels
+  Change = 5000,   ///< which client changed what
   Warning = 5000,  ///< requests that were refused, clients that were cut off, providers that do not return
-  Error = 6000,    ///< what keeps the server itself from its work
+  Error = 6000,    ///< errors of the server itself
 };
 
 void logLine(Level level, const std::string& text, const char* function, const char* file, int line) noexcept;
 
-/// The same for what a client can bring about: only so many lines come through in a second, and one tells how many did
-/// not. Nobody fills the disk with bad requests.
+/// The same for events that a client can cause. Only a limited number of lines is written per second, and one line
+/// reports how many were dropped, so bad requests cannot fill the disk.
 void logClientLine(Level level, const std::string& text, const char* function, const char* file, int line) noexcept;
 
-/// Whether lines of that level are written at all, so that nobody composes them in vain.
+/// Whether lines of that level are written at all. If not, do not compose them.
 bool isLogged(Level level) noexcept;
 void setLogLevel(int level);
 

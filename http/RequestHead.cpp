@@ -24,8 +24,8 @@ std::string_view trimmed(std::string_view text) {
   return text.substr(begin, text.find_last_not_of(" \t") - begin + 1);
 }
 
-/// The pieces between commas or semicolons, without the blanks around them; empty ones are left out. A separator within
-/// quotes separates nothing.
+/// The pieces between commas or semicolons, without surrounding blanks; empty ones are left out. A separator within
+/// quotes does not count.
 std::vector<std::string_view> split(std::string_view text, char separator) {
   std::vector<std::string_view> pieces;
   bool quoted = false;
@@ -59,7 +59,7 @@ std::string_view withoutPrefix(std::string_view name) {
   return prefixed && name[2] == '-' ? name.substr(3) : name;
 }
 
-/// Names of which a request has one at most: what decides how it is read, and what CIM puts there.
+/// Header fields that a request may have at most once: those that decide how it is read, and those of CIM.
 bool isSingle(std::string_view name) {
   constexpr std::string_view kSingle[] = {"Host", "Content-Length", "Transfer-Encoding", "Content-Type",
                                           "Man",  "Authorization",  "Content-Encoding"};
@@ -141,7 +141,7 @@ std::optional<Refusal> checkContent(const HeaderList& headers) {
   return std::nullopt;
 }
 
-/// Whether the client takes what it will get.
+/// Whether the client accepts the media type of the response.
 std::optional<Refusal> checkAccept(const HeaderList& headers) {
   const auto takes = [&](std::string_view name, std::initializer_list<std::string_view> words) {
     return findHeader(headers, name) == nullptr ||
@@ -214,7 +214,7 @@ bool asksForPage(std::string_view method, std::string_view path) {
 }
 
 HeaderList capabilities(std::string_view path) {
-  // Qualifier types can be read, but not be changed, so their group is not among the others.
+  // Qualifier types can be read but not changed, so their group is not included.
   return {{"Allow", std::string(allowedMethods(path))},
           {"Opt", "http://www.dmtf.org/cim/mapping/http/v1.0 ; ns=77"},
           {"77-CIMProtocolVersion", "1.4"},

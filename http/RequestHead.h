@@ -7,8 +7,8 @@
 
 #include "http/Exchange.h"
 
-// What is asked of a request before its body is taken: RFC 9110, RFC 9112, and clause 7 of DSP0200 1.4 (CIM operations
-// over HTTP). Pure functions.
+// Checks a request before its body is read: RFC 9110, RFC 9112, and clause 7 of DSP0200 1.4 (CIM operations over HTTP).
+// Pure functions.
 
 namespace zorva::http {
 
@@ -20,34 +20,34 @@ struct RequestHead {
   const HeaderList& headers;
 };
 
-/// An answer that needs no CIM.
+/// A response that needs no CIM operation.
 struct Refusal {
   int status = 400;
-  std::string why;            ///< a sentence for the person at the other end and for the log
+  std::string why;            ///< a sentence for the client's user and for the log
   std::string_view cimError;  ///< value of the header CIMError (DSP0200 7.3.3); empty: none
   std::string_view allow{};   ///< value of the header Allow; empty: none
 };
 
-/// Whether the request may go on to its body. Those that are answered without one may: OPTIONS, and GET and HEAD of
-/// "/".
+/// Whether the request may go on to its body. Requests that are answered without a body may: OPTIONS, and GET and HEAD
+/// of "/".
 ///
-/// Whatever two readers could take differently is refused, since one of them might be a proxy: Content-Length or
-/// Transfer-Encoding twice or together, codings after or instead of "chunked", names with characters that no name has.
+/// Whatever two readers could understand differently is refused, because one of them might be a proxy: Content-Length
+/// or Transfer-Encoding twice or together, codings after or instead of "chunked", invalid characters in names.
 std::optional<Refusal> checkHead(const RequestHead& head, std::size_t mostBodyBytes);
 
-/// The value of the first field of that name; null where there is none.
+/// The value of the first field of that name; null if there is none.
 const std::string* findHeader(const HeaderList& headers, std::string_view name);
 
 /// Whether a list such as that of TE or Accept-Encoding has that word, with a weight above 0 (RFC 9110 12.4.2).
 bool listHas(const HeaderList& headers, std::string_view name, std::string_view word);
 
-/// The methods that a path has, as the header Allow lists them. The root alone has a page for people.
+/// The methods of a path, as the header Allow lists them. Only the root has a page for people.
 std::string_view allowedMethods(std::string_view path);
 
-/// True for GET and HEAD of the root: a person asks what this is.
+/// True for GET and HEAD of the root: a person looks at the server with a browser.
 bool asksForPage(std::string_view method, std::string_view path);
 
-/// The answer to OPTIONS: what this server can do (DSP0200 7.5).
+/// The response to OPTIONS: the server's capabilities (DSP0200 7.5).
 HeaderList capabilities(std::string_view path);
 
 }  // namespace zorva::http

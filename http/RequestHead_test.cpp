@@ -16,7 +16,7 @@ HeaderList usual() {
           {"CIMMethod", "GetInstance"}, {"CIMObject", "root/cimv2"}};
 }
 
-/// The usual request with further fields behind its own, or in the place of those of the same name.
+/// The usual request with further fields after its own, which replace fields of the same name.
 std::optional<Refusal> check(HeaderList more, std::string_view method = "POST", std::string_view version = "HTTP/1.1") {
   HeaderList headers = usual();
   headers.insert(headers.end(), more.begin(), more.end());

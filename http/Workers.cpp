@@ -77,19 +77,19 @@ class Workers::Core : public WaitListener, public std::enable_shared_from_this<C
   std::ptrdiff_t places() const { return static_cast<std::ptrdiff_t>(limits_.workers) - active_ + hanging_; }
 
   mutable std::mutex mutex_;
-  std::vector<Sleeper*> sleepers_;  ///< the last one went to sleep last, and has the warmest cache
+  std::vector<Sleeper*> sleepers_;  ///< the last one fell asleep last and has the warmest cache
   std::condition_variable thread_ended_;
   HttpLimits limits_;
   const Work work_;
   std::deque<std::shared_ptr<HttpExchange>> queue_;
-  std::vector<std::shared_ptr<HttpExchange>> inFlight_;  ///< those of queue_ too
+  std::vector<std::shared_ptr<HttpExchange>> inFlight_;  ///< including those of queue_
   std::size_t threads_ = 0;
   std::size_t idle_ = 0;  ///< threads that wait for work
-  /// Requests that run and do not wait for their client. Below 0 for the moment in which one that waits is given up.
+  /// Requests that run and do not wait for their client. Below 0 for a moment when a waiting one is abandoned.
   std::ptrdiff_t active_ = 0;
-  std::ptrdiff_t hanging_ = 0;  ///< of active_, when it was last looked
+  std::ptrdiff_t hanging_ = 0;  ///< of active_, at the last look
   bool isWatched_ = false;      ///< a thread looks for places for the queue
-  std::size_t stuck_ = 0;       ///< threads whose request was given up
+  std::size_t stuck_ = 0;       ///< threads whose request was abandoned
   bool stopping_ = false;
 };
 
@@ -117,14 +117,14 @@ std::optional<Refusal> Workers::Core::submit(const std::shared_ptr<HttpExchange>
   return std::nullopt;
 }
 
-/// Beside the threads for those in the queue that may run, there is one for the next, or to watch while it waits.
+/// Besides the threads for queued requests that may run, there is one for the next request, or to watch while it waits.
 bool Workers::Core::needsThread() const {
   const std::size_t answering = inFlight_.size() - queue_.size();
   const auto spare = static_cast<std::ptrdiff_t>(threads_ - stuck_ - answering);
   return spare <= std::min(std::ssize(queue_), std::max(places(), std::ptrdiff_t{0}));
 }
 
-/// Of the clients that let their responses wait, the one that has done so for longest goes.
+/// Abandons the request whose client has let its response wait for longest.
 bool Workers::Core::makesRoom(Connections& connections) {
   std::shared_ptr<HttpExchange> slowest;
   Clock::duration longest = kMayWait;
@@ -169,9 +169,9 @@ void Workers::Core::run() {
   thread_ended_.notify_all();
 }
 
-/// False: there was nothing to do for so long that the thread should end.
+/// False: there was no work for so long that the thread should end.
 bool Workers::Core::sleep(std::unique_lock<std::mutex>& lock) {
-  // The thread's own: who wakes it may still be in release() when it is awake already.
+  // The thread's own: the waking thread may still be in release() when this thread already runs again.
   static thread_local Sleeper self(0);
   sleepers_.push_back(&self);
   ++idle_;
@@ -179,14 +179,14 @@ bool Workers::Core::sleep(std::unique_lock<std::mutex>& lock) {
   bool woken = self.try_acquire_for(kIdleThread);
   lock.lock();
   if (!woken && std::erase(sleepers_, &self) == 0) {
-    self.acquire();  // it is being woken just now
+    self.acquire();  // another thread is about to wake this one
     woken = true;
   }
   --idle_;
   return woken;
 }
 
-/// Waits a moment for a place for those in the queue. What hangs by then keeps none.
+/// Waits a moment for a place for the queued requests. A request that hangs by then loses its place.
 void Workers::Core::watch(std::unique_lock<std::mutex>& lock) {
   isWatched_ = true;
   lock.unlock();
@@ -195,7 +195,7 @@ void Workers::Core::watch(std::unique_lock<std::mutex>& lock) {
   lock.lock();
   hanging_ = hanging;
   isWatched_ = false;
-  // This thread takes one request, others take what else may run, and one more watches over the rest.
+  // This thread takes one request, others take what else may run, and one more watches the rest.
   const std::ptrdiff_t others = std::min(std::ssize(queue_), places() + 1) - 1;
   for (std::ptrdiff_t i = 0; i < others; ++i) {
     if (Sleeper* const next = nextSleeper()) {
@@ -212,7 +212,7 @@ std::ptrdiff_t Workers::Core::countHanging() const {
   return std::count_if(all.begin(), all.end(), [](const auto& each) { return each->hangs(); });
 }
 
-/// The thread to wake: it stays asleep until it is.
+/// The thread to wake; it sleeps until it is woken.
 Sleeper* Workers::Core::nextSleeper() {
   if (sleepers_.empty()) return nullptr;
   Sleeper* const next = sleepers_.back();
@@ -224,7 +224,7 @@ void Workers::Core::wakeOne() {
   if (Sleeper* const next = nextSleeper()) next->release();
 }
 
-/// Answers the next request. False: the request was given up meanwhile, and another thread has this one's place.
+/// Answers the next request. False: the request was abandoned meanwhile, and another thread has this one's place.
 bool Workers::Core::answer(std::unique_lock<std::mutex>& lock) {
   const std::shared_ptr<HttpExchange> exchange = std::move(queue_.front());
   queue_.pop_front();
@@ -236,7 +236,7 @@ bool Workers::Core::answer(std::unique_lock<std::mutex>& lock) {
   try {
     work_(*exchange);
   } catch (const ClientGone&) {
-    // Whoever cut it off has told so.
+    // The cause was already logged when the client was cut off.
   } catch (const std::exception& error) {
     ZORVA_LOG(Error, nameOf(*exchange) + ": " + error.what());
     otherwise.why = std::string("the server could not answer: ") + error.what();
@@ -251,7 +251,7 @@ bool Workers::Core::answer(std::unique_lock<std::mutex>& lock) {
   }
   forget(*exchange);
   --active_;
-  // Its next request can come as soon as the client has the response: by then this thread must count as free.
+  // The client may send its next request as soon as it has the response, so this thread must already count as free.
   ++idle_;
   lock.unlock();
   exchange->finish(otherwise);
@@ -263,7 +263,7 @@ bool Workers::Core::answer(std::unique_lock<std::mutex>& lock) {
 void Workers::Core::forget(HttpExchange& exchange) {
   const std::size_t place = std::exchange(exchange.place, std::string::npos);
   inFlight_.back()->place = place;
-  // The last one may be this one itself.
+  // The last element may be this one.
   if (inFlight_.back().get() == &exchange) exchange.place = std::string::npos;
   std::swap(inFlight_[place], inFlight_.back());
   inFlight_.pop_back();
@@ -318,7 +318,7 @@ void Workers::Core::giveUp(const std::shared_ptr<HttpExchange>& exchange, const 
   if (!exchange->giveUp(answer)) return;
   ZORVA_LOG(Error, nameOf(*exchange) + ": " + answer.why + "; given up");
   const std::lock_guard lock(mutex_);
-  if (exchange->place == std::string::npos) return;  // it came to its end just now
+  if (exchange->place == std::string::npos) return;  // it ended a moment ago
   forget(*exchange);
   for (auto queued = queue_.begin(); queued != queue_.end(); ++queued) {
     if (*queued != exchange) continue;

@@ -9,12 +9,12 @@
 #include "http/HttpExchange.h"
 #include "http/HttpLimits.h"
 
-// The threads that answer requests. They are made when they are needed and end when they are not.
+// The threads that answer requests. They are started when they are needed and end when they are idle.
 //
-// A request that waits for its client to take what is ready does not count as running. Neither does one that hangs (see
-// HttpExchange::hangs): it keeps its thread, and others run beside it, up to the limit on requests. One whose provider
-// does not return within its limit is given up: its client gets an answer, another thread takes the place of its own,
-// and its thread ends whenever the provider lets it. So neither slow clients nor hanging providers keep others from a
+// A request that waits for its client to read the response does not count as running. Neither does one that hangs (see
+// HttpExchange::hangs): it keeps its thread, and others run beside it, up to the limit on requests. A request whose
+// provider does not return in time is abandoned: its client gets a response, another thread takes the place of its own,
+// and its thread ends when the provider returns. So neither slow clients nor hanging providers keep others from a
 // worker.
 
 namespace zorva::http {
@@ -25,24 +25,25 @@ class Workers {
 
   Workers(const HttpLimits& limits, Work work);
 
-  /// Waits for all threads that are not stuck in a provider; these must not outlive what `work` uses: see drain().
+  /// Waits for all threads that are not stuck in a provider. Those must not outlive the objects that `work` uses: see
+  /// drain().
   ~Workers();
   Workers(const Workers&) = delete;
   Workers& operator=(const Workers&) = delete;
 
   void setLimits(const HttpLimits& limits);
 
-  /// Takes a request on, whose connection is suspended; or tells why not, and then leaves it alone. Where all places
-  /// are taken, a client that has let its response wait for longest gives way to `exchange`.
+  /// Accepts a request whose connection is suspended, or says why not and does not touch it. If all places are taken,
+  /// the request whose client has let its response wait for longest is abandoned for `exchange`.
   std::optional<Refusal> submit(const std::shared_ptr<HttpExchange>& exchange, Connections& connections);
 
-  /// Gives up the requests whose time is over.
+  /// Abandons the requests whose time is over.
   void sweep();
 
   /// How many requests are in work or waiting for it.
   std::size_t inFlight() const;
 
-  /// Gives up what is still in work, because the server ends.
+  /// Abandons all requests in work, because the server ends.
   void giveUpAll();
 
   /// Waits for the threads to end. False: some are still stuck in providers when the time is over.

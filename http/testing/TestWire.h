@@ -8,35 +8,34 @@
 
 #include "http/Listener.h"
 
-// For tests: a client that says on the wire what it is told to, be it HTTP or not.
+// For tests: a client that sends any bytes, valid HTTP or not.
 
 namespace zorva::http::testing {
 
-/// A response as it came.
+/// A response as received.
 struct WireResponse {
   int status = 0;
   std::map<std::string, std::string> headers;  ///< names in small letters
-  std::string body;                            ///< without the chunks around it
+  std::string body;                            ///< without chunk framing
   std::map<std::string, std::string> trailers;
-  bool complete = false;  ///< it ended as it had announced
+  bool complete = false;  ///< it ended as announced
 };
 
 class Wire {
  public:
-  /// Connects to 127.0.0.1; a receive buffer of that size, where one is given, makes a client that takes little at
-  /// once.
+  /// Connects to 127.0.0.1. A small receive buffer, if given, makes a client that reads little at once.
   explicit Wire(int port, int receiveBuffer = 0);
 
-  /// False: the other side is gone.
+  /// False: the other side has closed the connection.
   bool send(std::string_view bytes);
 
-  /// The next response; a status of 0 where the connection ends without one. Waits no longer than `most` in all.
+  /// The next response; a status of 0 if the connection ends without one. Waits no longer than `most` in all.
   WireResponse receive(std::chrono::milliseconds most = std::chrono::seconds(20));
 
-  /// Whether the other side closes within that time; what it sends until then is dropped.
+  /// Whether the other side closes within that time; data that it sends until then is dropped.
   bool isClosedWithin(std::chrono::milliseconds time);
 
-  /// Takes up to that many bytes that are there or come within the time.
+  /// Reads up to that many bytes that arrive within the time.
   std::string take(std::size_t most, std::chrono::milliseconds time);
 
  private:
@@ -56,7 +55,7 @@ std::string posting(std::string_view body, std::string_view fields = {});
 /// The same for the instance names of a class of root/cimv2.
 std::string enumeration(std::string_view operation, std::string_view className, std::string_view fields = {});
 
-/// The text that a gzip member holds; empty where it is none.
+/// The text of a gzip member; empty if it is none.
 std::string gunzipped(const std::string& text);
 
 }  // namespace zorva::http::testing
