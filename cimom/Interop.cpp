@@ -30,7 +30,7 @@ constexpr CMPIStatus kOk{CMPI_RC_OK, nullptr};
 
 const CMPIBroker* brokerOf(const void* hdl) noexcept { return static_cast<const CMPIBroker*>(hdl); }
 
-/// The names of a class's instances in the namespace of the endpoints; none where they cannot be had.
+/// The names of a class's instances in the namespace of the endpoints; none if they cannot be read.
 std::vector<ObjectPath> namesOf(const CMPIBroker* broker, const CMPIContext* context, const char* className) {
   std::vector<ObjectPath> names;
   CMPIStatus status = kOk;
@@ -49,8 +49,8 @@ std::string hostName() {
   return gethostname(name, sizeof name - 1) == 0 && name[0] != '\0' ? name : "localhost";
 }
 
-/// What the instances of a class are made of. A provider is asked only where they need it: they can be had while it
-/// hangs.
+/// The data from which the instances of a class are made. A provider is asked only if they need it: the other instances
+/// can be read while it hangs.
 InteropWorld worldAt(const CMPIBroker* broker, const CMPIContext* context, const CMPIObjectPath* asked,
                      std::string_view className) {
   InteropWorld world;
@@ -160,7 +160,7 @@ CMPIStatus cleanUpAssociations(CMPIAssociationMI* mi, const CMPIContext*, CMPIBo
 
 bool fits(const std::string& name, const char* role) { return role == nullptr || schema::sameName(name, role); }
 
-/// The associations of `source`: `visit(association, far end)` for each of its ends that `source` stands at.
+/// The associations of `source`: `visit(association, far end)` for each end that is `source`.
 template <class Visit>
 void walk(const InteropWorld& world, const ObjectPath& source, const char* association, const char* role,
           const char* resultRole, Visit&& visit) {
@@ -184,7 +184,7 @@ CMPIStatus associators(CMPIAssociationMI* mi, const CMPIContext* context, const 
   walk(world, valueOf(asked), association, role, resultRole, [&](const Instance&, const ObjectPath& farEnd) {
     CMPIStatus status = kOk;
     const CMPIInstance* found = CBGetInstance(broker, context, objectOf(farEnd), nullptr, &status);
-    if (found != nullptr) CMReturnInstance(result, found);  // else it has gone meanwhile
+    if (found != nullptr) CMReturnInstance(result, found);  // else it was removed meanwhile
   });
   CMReturnDone(result);
   return kOk;

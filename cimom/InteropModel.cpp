@@ -31,7 +31,7 @@ Instance make(const InteropWorld& world, std::string className, std::vector<brok
   return instance;
 }
 
-/// The system that the server runs on; where no provider tells of one, the host's name stands for it.
+/// The system that the server runs on; if no provider returns one, the host's name is used.
 broker::NamedValue systemClass(const InteropWorld& world) {
   return {"SystemCreationClassName",
           text(world.systems.empty() ? "CIM_ComputerSystem" : world.systems.front().className)};
@@ -104,7 +104,7 @@ Instance profile(const InteropWorld& world) {
            {{"ElementName", text("Zorva DNS Client")},
             {"Description", text("The DNS client configuration of a host, as the classes ZORVA_DNS* publish it")},
             {"SpecificationType", number(2, Type::Uint16)},
-            // Other: conformance to a profile of another publisher is not claimed.
+            // Other: conformance to a profile of another publisher is not declared.
             {"RegisteredOrganization", number(1, Type::Uint16)},
             {"OtherRegisteredOrganization", text("Zorva")},
             {"RegisteredName", text("Zorva DNS Client")},
@@ -114,7 +114,7 @@ Instance profile(const InteropWorld& world) {
   return instance;
 }
 
-/// Of the central instances alone: what a client finds by the association is what GetCentralInstances gives.
+/// Only for the central instances: the association and GetCentralInstances give the same.
 std::vector<Instance> conformances(const InteropWorld& world) {
   std::vector<Instance> all;
   for (const ObjectPath& endpoint : world.endpoints) {

@@ -13,11 +13,11 @@ namespace zorva::cimom {
 inline constexpr const char* kProfileClass = "CIM_RegisteredProfile";
 inline constexpr const char* kConformanceClass = "CIM_ElementConformsToProfile";
 
-/// What the instances tell of.
+/// The facts from which the instances are made.
 struct InteropWorld {
-  std::string nameSpace;                ///< in which they are asked for
-  std::string profileNameSpace;         ///< in which the profile is registered
-  std::vector<std::string> nameSpaces;  ///< all that the server has
+  std::string nameSpace;                ///< the namespace of the request
+  std::string profileNameSpace;         ///< the namespace in which the profile is registered
+  std::vector<std::string> nameSpaces;  ///< all namespaces of the server
   std::string hostName;
   std::vector<broker::ObjectPath> systems;    ///< the computer systems
   std::vector<broker::ObjectPath> endpoints;  ///< the DNS endpoints

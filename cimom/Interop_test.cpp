@@ -76,7 +76,7 @@ TEST(InteropModel, ComparesInstancesByClassAndKeysAlone) {
   EXPECT_FALSE(sameInstance(a, b));
 }
 
-/// Over a broker that has no provider libraries: the server tells of itself all the same.
+/// Uses a broker without provider libraries: the server must describe itself even so.
 class InteropTest : public ::testing::Test {
  protected:
   InteropTest() {

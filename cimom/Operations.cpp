@@ -13,7 +13,7 @@ namespace {
 
 using broker::Status;
 
-/// Operations that DSP0200 has and this server does not offer.
+/// Operations of DSP0200 that this server does not offer.
 constexpr std::pair<std::string_view, const char*> kNotOffered[] = {
     {"CreateClass", "the classes are built in and cannot be changed"},
     {"ModifyClass", "the classes are built in and cannot be changed"},
@@ -39,7 +39,7 @@ OperationFunction findOperation(std::string_view name) noexcept {
   return nullptr;
 }
 
-/// A parameter that is there twice, in any case; empty where there is none.
+/// The name of a parameter that is given twice, in any case; empty if there is none.
 template <class Parameters>
 std::string_view twice(const Parameters& parameters) {
   std::vector<std::string_view> names;
@@ -56,7 +56,7 @@ Status checkParameterNames(const cimxml::Call& call) {
           call.name + ": the parameter " + broker::quotedText(name.substr(0, 80)) + " is there twice"};
 }
 
-/// CMPI has codes that CIM lacks.
+/// Replaces CMPI codes that CIM lacks.
 Status asCim(Status status) {
   constexpr int kLastOfCim = 29;
   if (status.rc >= 0 && status.rc <= kLastOfCim) return status;
@@ -102,7 +102,7 @@ void settleValue(const Operation& operation, broker::Value& value) {
 
 namespace {
 
-/// Providers name the host of what they give as they name the computer system, which may be configured.
+/// Providers use the computer system's name, which is configurable, as host of their results.
 bool isNameOfASystem(const Operation& operation, std::string_view host) {
   bool found = false;
   const broker::PathSink look = [&](const broker::ObjectPath& path) {
@@ -114,7 +114,7 @@ bool isNameOfASystem(const Operation& operation, std::string_view host) {
   return found;
 }
 
-/// Whether a name has all the keys that were given.
+/// Whether a name has all the given keys.
 bool hasKeys(const broker::ObjectPath& name, const broker::ObjectPath& given) {
   return schema::sameName(name.className, given.className) &&
          std::all_of(given.keys.begin(), given.keys.end(), [&name](const broker::NamedValue& key) {
@@ -123,8 +123,8 @@ bool hasKeys(const broker::ObjectPath& name, const broker::ObjectPath& given) {
          });
 }
 
-/// Clients leave out keys that tell them nothing. Where one instance alone has those that they give, it is meant; else
-/// the provider decides.
+/// Clients may leave out keys whose values they do not know. If exactly one instance has the given keys, that one is
+/// used; else the provider decides.
 void completeKeys(const Operation& operation, broker::ObjectPath& path) {
   const schema::Class* declared = operation.classes().find(path.className);
   broker::ObjectPath given;
@@ -156,7 +156,7 @@ Status settlePath(const Operation& operation, broker::ObjectPath& path) {
     settleValue(operation, key.value);
     if (!key.name.empty()) continue;
     const schema::Class* declared = operation.classes().find(path.className);
-    if (declared == nullptr) continue;  // which the broker says
+    if (declared == nullptr) continue;  // the broker reports it
     if (declared->keys().size() != 1) {
       return {CMPI_RC_ERR_INVALID_PARAMETER,
               declared->name() + " has " + std::to_string(declared->keys().size()) + " keys, so each needs its name"};
@@ -169,12 +169,12 @@ Status settlePath(const Operation& operation, broker::ObjectPath& path) {
 
 namespace {
 
-/// Values that come without a type take the declared one; a type that the client names has to be that one.
+/// Values without a type get the declared type. A type that the client names must be the declared one.
 Status checkSaidTypes(const Operation& operation) {
   const cimxml::Call& call = operation.call;
   const schema::Class* declared = operation.classes().find(call.target.className);
   const schema::ClassMethod* method = declared != nullptr ? declared->findMethod(call.name) : nullptr;
-  if (method == nullptr) return {};  // which the broker says
+  if (method == nullptr) return {};  // the broker reports it
   for (std::size_t i = 0; i < call.input.size(); ++i) {
     for (const schema::Parameter& parameter : method->parameters) {
       if (!call.saidTypes[i] || *call.saidTypes[i] == parameter.type) continue;
@@ -187,7 +187,8 @@ Status checkSaidTypes(const Operation& operation) {
   return {};
 }
 
-/// What a method does is not known here: one that ends well counts as a change, but for the one that is known to read.
+/// The effect of a method is not known here: a successful call counts as a change, except for the one method that is
+/// known to read only.
 void noteCall(const Operation& operation, const broker::ObjectPath& path, const broker::MethodResult& result) {
   const broker::Scalar& value = result.returnValue.scalar;
   const bool isDone = result.returnValue.isNull || value == broker::Scalar(std::uint64_t{0}) ||

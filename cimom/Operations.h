@@ -12,12 +12,12 @@
 #include "cimxml/RequestReader.h"
 #include "cimxml/ResponseWriter.h"
 
-// The operations of DSP0200 1.4: each takes its parameters from a call, has the broker or the schema do the work, and
-// writes its response while the results come.
+// The operations of DSP0200 1.4. Each takes its parameters from a call, lets the broker or the schema do the work, and
+// writes its response while the results arrive.
 
 namespace zorva::cimom {
 
-/// All that an operation works with. It lives as long as one call.
+/// The context of one operation. It lives as long as one call.
 struct Operation {
   broker::Broker& broker;
   PullTable& pulls;
@@ -28,46 +28,44 @@ struct Operation {
   const std::string& client;    ///< http::HttpRequest::client
   std::string_view hostHeader;  ///< as the client named this host
   std::string nameSpace;        ///< as the registry spells it
-  /// Takes the rest of a line that says what the client has changed.
+  /// Takes the rest of a line that says what the client changed.
   std::function<void(const std::string& what)> noteChange;
 
   const schema::ClassRepository& classes() const { return broker.classes(); }
 };
 
-/// Carries out a call and writes the content of its response. On a failure, what was written is to be taken back, if it
-/// still can be; its `rc` is a CIM status code. Throws what the writer throws, and nothing else save for want of
-/// memory.
+/// Executes a call and writes the content of its response. If it fails, the caller must take back what was written, if
+/// that is still possible; the `rc` is a CIM status code. Throws only std::bad_alloc and what the writer throws.
 broker::Status carryOut(Operation& operation);
 
-// What the files of the operations share.
+// Shared by the files of the operations.
 
 using OperationFunction = broker::Status (*)(Operation& operation);
 
-/// Nothing where the file has no operation of that name.
+/// Nothing if the file has no operation of that name.
 OperationFunction findInstanceOperation(std::string_view name) noexcept;
 OperationFunction findAssociationOperation(std::string_view name) noexcept;
 OperationFunction findClassOperation(std::string_view name) noexcept;
 OperationFunction findPullOperation(std::string_view name) noexcept;
 broker::Status invokeMethod(Operation& operation);
 
-/// The path as the broker takes it: in the call's namespace, the host left out where it is this one, in references too,
-/// a nameless key under its name, and keys that are left out added where they can only be those of one instance. A path
-/// of another host is CIM_ERR_INVALID_PARAMETER.
+/// Brings the path into the form that the broker takes. It gets the call's namespace. A host that is this one is
+/// removed, in references too. A key without a name gets its name. Missing keys are added if only one instance has the
+/// given ones. A path of another host is CIM_ERR_INVALID_PARAMETER.
 broker::Status settlePath(const Operation& operation, broker::ObjectPath& path);
-/// The same for the references among a value.
+/// The same for the references in a value.
 void settleValue(const Operation& operation, broker::Value& value);
 
-/// Leaves a line about a change that succeeded: what was done to which object, and which of its properties or
-/// parameters were named.
+/// Logs a change that succeeded: the action, the object, and the names of the given properties or parameters.
 void noteChange(const Operation& operation, std::string_view what, const broker::ObjectPath& path,
                 const std::vector<std::string>& names = {});
 
-/// Carries what the writer throws past a provider, which must not see it: write in put(), then finish().
+/// Carries the writer's exceptions past a provider, which must not see them: write in put(), then call finish().
 class Stream {
  public:
   explicit Stream(cimxml::ResponseWriter& writer) : writer_(writer) {}
 
-  /// Runs `append(std::string&)`. False where the response cannot go on: the provider is to end.
+  /// Runs `append(std::string&)`. False if the response cannot go on: the provider must end.
   template <class Append>
   bool put(Append&& append) {
     try {
@@ -80,7 +78,7 @@ class Stream {
     }
   }
 
-  /// Throws what was thrown in put().
+  /// Throws what put() caught.
   void finish() const {
     if (problem_) std::rethrow_exception(problem_);
   }

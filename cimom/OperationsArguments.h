@@ -9,9 +9,8 @@
 #include "broker/objects/Value.h"
 #include "cimxml/RequestReader.h"
 
-// The parameters of an intrinsic operation, taken one by one under the names and with the defaults that DSP0200 gives
-// them. The first that is wrong is remembered; the operation asks once, with status(), when it has taken all that it
-// knows.
+// The parameters of an intrinsic operation, taken one by one under the names and with the defaults of DSP0200. The
+// first error is remembered; after the operation has taken all its parameters, it asks once with status().
 
 namespace zorva::cimom {
 
@@ -21,24 +20,24 @@ class Arguments {
   explicit Arguments(const cimxml::Call& call) : call_(call), taken_(call.parameters.size()) {}
 
   bool boolean(std::string_view name, bool otherwise);
-  /// Nothing where it is left out or null.
+  /// Nothing if it is left out or null.
   std::optional<std::uint64_t> number(std::string_view name);
   std::optional<std::string> text(std::string_view name);
   std::optional<std::vector<std::string>> names(std::string_view name);
-  /// Empty where it is left out or null.
+  /// Empty if it is left out or null.
   std::string className(std::string_view name);
 
-  // These must be there.
+  // Required parameters.
   std::string requiredText(std::string_view name);
   std::string requiredClassName(std::string_view name);
   broker::ObjectPath requiredPath(std::string_view name);
   broker::Instance requiredInstance(std::string_view name);
-  /// The name of a class or of an instance; of a class it is a path without keys.
+  /// The name of a class or of an instance; the name of a class is a path without keys.
   broker::ObjectPath requiredObject(std::string_view name, bool& isClass);
-  /// VALUE, VALUE.ARRAY or VALUE.REFERENCE; null where it is left out.
+  /// VALUE, VALUE.ARRAY or VALUE.REFERENCE; null if it is left out.
   broker::Value value(std::string_view name);
 
-  /// What was wrong first: CIM_ERR_INVALID_PARAMETER, for a parameter too that nobody took.
+  /// The first error: CIM_ERR_INVALID_PARAMETER, also for a parameter that the operation does not have.
   broker::Status status() const;
 
  private:

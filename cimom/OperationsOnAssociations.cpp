@@ -7,8 +7,8 @@
 #include "cimxml/ElementWriter.h"
 #include "cmpidt.h"
 
-// DSP0200 5.3.2.14 Associators, .15 AssociatorNames, .16 References, .17 ReferenceNames; of instances by the broker, of
-// classes by what the schema says.
+// DSP0200 5.3.2.14 Associators, .15 AssociatorNames, .16 References, .17 ReferenceNames; for instances by the broker,
+// for classes from the schema.
 
 namespace zorva::cimom {
 
@@ -19,7 +19,7 @@ using schema::Class;
 using schema::ClassProperty;
 using schema::sameName;
 
-/// The four operations in one: which objects, and what of them.
+/// The parameters of all four operations: which objects, and which part of them.
 struct Question {
   bool ofReferences = false;
   bool namesOnly = false;
@@ -45,7 +45,7 @@ bool fits(const ClassProperty& end, const std::string& role) { return role.empty
 /// Whether an object of either class may be one of the other.
 bool related(const Class& a, const Class& b) { return a.isA(b) || b.isA(a); }
 
-/// The classes that an association leads to from `source`, or the association itself.
+/// The classes to which an association leads from `source`, or the association itself.
 void collect(const Class& association, const Class& source, const Question& question, const Class* resultClass,
              std::vector<const Class*>& found) {
   const auto add = [&found](const Class& one) {

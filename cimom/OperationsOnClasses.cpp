@@ -36,7 +36,7 @@ Status getClass(Operation& operation) {
   return {};
 }
 
-/// The classes below the one that is named, or below none.
+/// The subclasses of the named class, or the root classes if none is named.
 Status findBelow(Operation& operation, Arguments& arguments, std::vector<const Class*>& found) {
   const std::string name = arguments.className("ClassName");
   const bool deep = arguments.boolean("DeepInheritance", false);

@@ -4,7 +4,7 @@
 #include "cimxml/ElementWriter.h"
 #include "cmpidt.h"
 
-// DSP0200 5.3.2.24: the enumerations that a client opens, pulls and closes.
+// DSP0200 5.3.2.24: enumerations that a client opens, pulls and closes.
 
 namespace zorva::cimom {
 
@@ -12,10 +12,10 @@ namespace {
 
 using broker::Status;
 
-/// What each opening operation has.
+/// The parameters of every opening operation.
 struct Opening {
   std::chrono::seconds timeout{};
-  std::size_t count = 0;  ///< how many objects are wanted at once
+  std::size_t count = 0;  ///< how many objects are requested at once
 };
 
 Status takeCount(const PullLimits& limits, std::optional<std::uint64_t> given, std::size_t& count) {
@@ -52,7 +52,7 @@ Status takeOpening(Operation& operation, Arguments& arguments, Opening& opening)
   return status.ok() ? takeCount(operation.pulls.limits(), count, opening.count) : status;
 }
 
-/// The objects that are handed out, then whether there are more, and where.
+/// Writes the objects, then whether there are more, and the context.
 void write(Operation& operation, const PullObjects& objects, bool ended, const std::string& context) {
   cimxml::ResponseWriter& writer = operation.writer;
   writer.beginReturnValue();
@@ -66,7 +66,7 @@ void write(Operation& operation, const PullObjects& objects, bool ended, const s
                                                                      : broker::Value::text(context)});
 }
 
-/// Collects what a request gives, as text.
+/// Collects the results of a request, as text.
 class Collector {
  public:
   explicit Collector(Operation& operation) : operation_(operation), objects_(operation.pulls) {}
@@ -89,7 +89,7 @@ class Collector {
     };
   }
 
-  /// Hands out the first objects and keeps the rest.
+  /// Sends the first objects and keeps the rest.
   Status answer(PullForm form, const Opening& opening, Status status) {
     if (isFull_) {
       return {kServerLimitsExceeded, "the open enumerations hold more than " +

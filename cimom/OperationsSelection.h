@@ -9,8 +9,8 @@
 
 namespace zorva::cimom {
 
-/// IncludeQualifiers, IncludeClassOrigin, PropertyList and, where the operation has it, LocalOnly, which counts as
-/// false: it is deprecated (DSP0200 5.3.2.2), and with its default clients would miss what the class inherits.
+/// IncludeQualifiers, IncludeClassOrigin, PropertyList and, if the operation has it, LocalOnly, which counts as false:
+/// it is deprecated (DSP0200 5.3.2.2), and with its default clients would not see inherited properties.
 inline broker::Selection takeSelection(Arguments& arguments, bool hasLocalOnly) {
   broker::Selection selection;
   if (hasLocalOnly) arguments.boolean("LocalOnly", false);
@@ -24,7 +24,7 @@ inline cimxml::InstanceDetail detailOf(const Operation& operation, const broker:
   return {selection.includeClassOrigin, selection.includeQualifiers ? &operation.classes() : nullptr};
 }
 
-/// What of an association is wanted; `ofReferences`: without the far end.
+/// The requested part of an association; `ofReferences`: without the far end.
 inline broker::AssociationFilter takeFilter(Arguments& arguments, bool ofReferences) {
   broker::AssociationFilter filter;
   if (ofReferences) {

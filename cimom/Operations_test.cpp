@@ -1,4 +1,4 @@
-// Each operation as a client sees it: what is asked as XML, and the XML that comes back. Every response is validated.
+// Each operation as a client sees it: the request as XML, and the response as XML. Every response is validated.
 #include "cimom/Operations.h"
 
 #include <gmock/gmock.h>
@@ -18,7 +18,7 @@ using ::testing::Not;
 using testing::parameter;
 using testing::text;
 
-/// The number of times that a piece stands in a text.
+/// How often a piece occurs in a text.
 std::size_t count(const std::string& all, const std::string& piece) {
   std::size_t found = 0;
   for (std::size_t at = all.find(piece); at != std::string::npos; at = all.find(piece, at + 1)) ++found;
@@ -410,7 +410,7 @@ TEST_F(OperationsTest, AChangeLeavesALineThatSaysWhoChangedWhat) {
                               more);
   };
   modify("");
-  modify("");  // it is so already
+  modify("");  // it has this value already
   modify(names("PropertyList", {}));
   ask("SetProperty", parameter("InstanceName", thing("a")) + text("PropertyName", "size") + text("NewValue", "12"));
   invoke("Call", thing("a"), "<PARAMVALUE NAME=\"Text\"><VALUE>x</VALUE></PARAMVALUE>");
@@ -442,7 +442,7 @@ TEST_F(OperationsTest, AClientWritesNoLinesOfItsOwnIntoTheLineOfAChange) {
                                                          "root/cimv2:T_Thing.Name=\"x\\n2026 forged?\": Text"));
 }
 
-// What goes wrong.
+// Errors.
 
 TEST_F(OperationsTest, ParametersAreChecked) {
   const std::string ok = className("ClassName", "T_Thing");

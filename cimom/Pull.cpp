@@ -11,10 +11,10 @@ namespace zorva::cimom {
 
 namespace {
 
-// What a text takes beside its bytes.
+// The memory of a text besides its bytes.
 constexpr std::size_t kOverhead = 64;
 
-/// A name that nobody can guess: who has it may go on with the enumeration.
+/// A name that cannot be guessed: any client that has it may continue the enumeration.
 std::string newContext() {
   unsigned char bytes[16];
   std::size_t filled = 0;
@@ -52,8 +52,8 @@ void PullObjects::moveTo(PullObjects& taken, std::size_t count) {
   }
 }
 
-/// Of the clients whose enumerations weigh most together, the one that has waited longest; `weight` gets what those of
-/// its client weigh. The end where none is open.
+/// Finds the client whose enumerations are largest together, and of these the one that has waited longest. `weight`
+/// gets the size of all enumerations of that client. Returns the end if none is open.
 PullTable::Map::iterator PullTable::nextToGiveWay(Weight weightOf, std::size_t& weight) {
   std::map<std::string_view, std::size_t> weights;
   for (const auto& [context, open] : open_) weights[open.client] += weightOf(open);
@@ -72,8 +72,8 @@ PullTable::Map::iterator PullTable::longestWaiting(Predicate&& isMeant) {
   return longest;
 }
 
-/// Takes a share of the bytes for an enumeration that is being collected and holds `held`. Clients that hold more than
-/// it does give way; no other, so that one large enumeration does not end those of everybody.
+/// Takes a share of the bytes for an enumeration that is being collected and holds `held`. Only the enumerations of
+/// clients that hold more are dropped for it, so that one large enumeration does not end all others.
 bool PullTable::takeBytes(std::size_t size, std::size_t held) {
   const auto fits = [&] {
     if (bytes_.fetch_add(size) + size <= limits_.maxBytes) return true;
@@ -91,7 +91,7 @@ bool PullTable::takeBytes(std::size_t size, std::size_t held) {
   return true;
 }
 
-/// Makes room for one more of a client.
+/// Makes room for one more enumeration of a client.
 void PullTable::makeRoomFor(const std::string& client) {
   const auto isOwn = [&](const Open& open) { return open.client == client; };
   const auto own = std::count_if(open_.begin(), open_.end(), [&](const auto& entry) { return isOwn(entry.second); });

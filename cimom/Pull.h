@@ -14,12 +14,13 @@
 #include "broker/objects/Value.h"
 
 // Enumerations that clients pull in pieces (DSP0200 5.3.2.24). The objects are collected when the enumeration is opened
-// and are kept as the text that goes into responses; so a client sees one state of the system, and a slow client holds
-// no provider. What is kept is bounded, in number and in bytes; what no client comes back for goes after its timeout.
+// and are kept as the text of the responses. So a client sees one state of the system, and a slow client does not keep
+// a provider busy. The number of enumerations and their bytes are limited. An enumeration that its client does not
+// continue is dropped after its timeout.
 //
-// Where there is no more room, the enumeration that has waited longest for its client gives way, so that nobody is
-// locked out: that of the client itself where it has as many as a client may have, else that of the client which has
-// most. An enumeration that fits its first answer is never kept and needs no room.
+// If there is no room, the enumeration that has waited longest for its client is dropped, so that no client is locked
+// out: one of the same client if it has as many as a client may have, else one of the client that has most. An
+// enumeration that fits its first response is never kept and needs no room.
 //
 // Any number of threads may use one PullTable at once.
 
@@ -40,17 +41,17 @@ struct PullLimits {
   std::size_t maxOpen = 100;  ///< of all clients; 0: none is kept
   std::size_t maxOpenOfClient = 25;
   std::size_t maxEmptyPulls = 10;     ///< pulls of zero objects one after another, each of which renews the timeout
-  std::size_t maxObjects = 10'000;    ///< that one pull may ask for
+  std::size_t maxObjects = 10'000;    ///< the most that one pull may request
   std::size_t maxBytes = 64U << 20U;  ///< of text, in all enumerations together
 };
 
-/// What an enumeration gives.
+/// The form of an enumeration's results.
 enum class PullForm { Instances, Paths };
 
 class PullTable;
 
-/// Objects of one enumeration, in order, and their share of the table's bytes, which is given back with them. Where the
-/// bytes are all taken, the clients whose enumerations hold more than this one give way.
+/// Objects of one enumeration, in order, and their share of the table's bytes, which the destructor gives back. If all
+/// bytes are taken, enumerations of clients that hold more than this one are dropped.
 class PullObjects {
  public:
   explicit PullObjects(PullTable& table) noexcept : table_(table) {}
@@ -58,12 +59,12 @@ class PullObjects {
   PullObjects(const PullObjects&) = delete;
   PullObjects& operator=(const PullObjects&) = delete;
 
-  /// False, with nothing added, where the table has no room left.
+  /// False, with nothing added, if the table has no room left.
   bool add(std::string_view text);
   std::size_t size() const noexcept { return texts_.size(); }
   std::size_t bytes() const noexcept { return bytes_; }
   const std::deque<std::string>& texts() const noexcept { return texts_; }
-  /// Moves the first `count` of them, or all that there are, to `taken`.
+  /// Moves the first `count` of them, or all, to `taken`.
   void moveTo(PullObjects& taken, std::size_t count);
 
  private:
@@ -82,14 +83,14 @@ class PullTable {
 
   const PullLimits& limits() const noexcept { return limits_; }
 
-  /// Keeps what is left of an enumeration of `client`; others may give way. `context` gets the name under which it is
-  /// found again. CIM_ERR_SERVER_LIMITS_EXCEEDED where none may be kept.
+  /// Keeps the rest of an enumeration of `client`; others may be dropped for it. `context` gets the name by which it is
+  /// found again. CIM_ERR_SERVER_LIMITS_EXCEEDED if none may be kept.
   broker::Status keep(const std::string& client, PullForm form, std::string_view nameSpace, PullObjects& rest,
                       std::chrono::seconds timeout, std::string& context, Clock::time_point now = Clock::now());
 
-  /// Moves up to `count` objects to `taken`. `ended`: none are left, and the context with them. The timeout begins
-  /// anew. CIM_ERR_INVALID_ENUMERATION_CONTEXT where there is no such context, in this namespace and of this form;
-  /// CIM_ERR_SERVER_LIMITS_EXCEEDED, and no new timeout, where `count` has been 0 too often.
+  /// Moves up to `count` objects to `taken`. `ended`: none are left, and the context is gone. The timeout starts again.
+  /// CIM_ERR_INVALID_ENUMERATION_CONTEXT if there is no such context, in this namespace and of this form;
+  /// CIM_ERR_SERVER_LIMITS_EXCEEDED, without a new timeout, if `count` has been 0 too often.
   broker::Status take(const std::string& context, std::string_view nameSpace, PullForm form, std::size_t count,
                       PullObjects& taken, bool& ended, Clock::time_point now = Clock::now());
 
@@ -99,7 +100,7 @@ class PullTable {
   broker::Status count(const std::string& context, std::string_view nameSpace, std::uint64_t& left,
                        Clock::time_point now = Clock::now());
 
-  /// Drops what nobody has come back for in time. The functions above do so too.
+  /// Drops enumerations whose clients did not continue them in time. The functions above do so too.
   void reclaim(Clock::time_point now = Clock::now());
 
   std::size_t openCount() const;

@@ -21,11 +21,11 @@ namespace {
 using broker::LogLevel;
 using broker::Status;
 
-// Bodies above this size are read one at a time: reading one takes a processor, which others need as well.
+// Bodies above this size are read one at a time: reading one keeps a processor busy that others need as well.
 constexpr std::size_t kLargeBody = 128U << 10U;
 constexpr std::chrono::milliseconds kBetweenLooks{100};
 
-// A buffer that a response of large objects has made larger than this is not kept for the next request.
+// If a buffer has grown larger than this for a response of large objects, it is not kept for the next request.
 constexpr std::size_t kMostKept = 256U << 10U;
 
 HttpRefusal refusalOf(const cimxml::RequestError& error) {
@@ -59,7 +59,7 @@ PullLimits pullLimits(const ServiceOptions& options) {
   return limits;
 }
 
-/// The turn to read a large body; none is needed for a small one.
+/// The permission to read a large body; a small one needs none.
 class Turn {
  public:
   Turn(std::binary_semaphore& turns, const http::HttpRequest& http, const http::ResponseSink& sink)
@@ -78,7 +78,7 @@ class Turn {
   std::binary_semaphore* const turns_;
 };
 
-/// What an answer repeats of its request.
+/// The parts of a request that its response repeats.
 struct Outline {
   struct CallName {
     std::string name;
@@ -90,7 +90,7 @@ struct Outline {
   CimHeaders headers;
 };
 
-/// Says of each operation that it has failed.
+/// Writes that each operation has failed.
 void writeFailures(const Outline& outline, const std::string& why, http::ResponseSink& sink) {
   sink.begin(200, responseHeaders(outline.headers));
   std::string text;
@@ -104,7 +104,7 @@ void writeFailures(const Outline& outline, const std::string& why, http::Respons
   writer.endMessage();
 }
 
-/// The request itself ends with the work on it, which may be while the late answer is written.
+/// The late answer owns its data: the request may be destroyed while the answer is written.
 http::LateAnswer lateAnswer(const cimxml::CimRequest& request, const CimHeaders& headers) {
   auto outline = std::make_shared<Outline>();
   outline->id = request.id;
@@ -118,7 +118,7 @@ http::LateAnswer lateAnswer(const cimxml::CimRequest& request, const CimHeaders&
   };
 }
 
-/// What clients send is in the lines of the log: it must not look like a line of its own.
+/// Log lines contain text from clients: a control character in it must not start a new line.
 std::string withoutControls(std::string text) {
   std::replace_if(
       text.begin(), text.end(), [](unsigned char c) { return c < 0x20 || c == 0x7F; }, '?');
@@ -130,7 +130,7 @@ std::string whoIs(const http::HttpRequest& http) {
   return http.client.empty() ? http.peer : http.peer + " (" + http.client + ")";
 }
 
-/// The memory that this thread's responses gather in, used again and again.
+/// The buffer in which this thread's responses are gathered, reused for each request.
 class Buffer {
  public:
   Buffer() = default;
@@ -201,7 +201,7 @@ class ServiceCore {
     sink.write(refusal.message + "\n");
   }
 
-  /// Who asks, as far as the request says so.
+  /// The client, as far as the request identifies it.
   struct Client {
     const CimHeaders& headers;
     const broker::Caller& caller;

@@ -11,29 +11,29 @@
 #include "broker/Broker.h"
 #include "http/Exchange.h"
 
-// CIM operations over HTTP (DSP0200 1.4) without the HTTP: reads a request's XML, has the broker carry it out, and
-// writes the response's XML while it grows.
+// CIM operations over HTTP (DSP0200 1.4) without the HTTP: reads a request's XML, executes it on the broker, and writes
+// the response's XML while the results arrive.
 
 namespace zorva::cimom {
 
 struct ServiceOptions {
-  /// The namespaces of the server itself are described as reached here; may be empty.
+  /// The host name in the server's description of its own namespaces; may be empty.
   std::string hostName;
-  /// Where log lines go; may be empty. Called on any thread.
+  /// Takes log lines; may be empty. Called on any thread.
   broker::LogHook log;
-  /// Takes a line for each change that was made: who, which object, and what of it. May be empty. Called on any thread.
+  /// Takes a line for each change: the client, the object, and what was changed. May be empty. Called on any thread.
   std::function<void(const std::string& line)> changes;
 
-  std::size_t maxDepth = 128;       ///< the most elements, one within another, in a request
+  std::size_t maxDepth = 128;       ///< the deepest nesting of elements in a request
   std::size_t maxOperations = 100;  ///< the most operations in one multiple request
   std::size_t unsentText = 65536;   ///< response text that is gathered before it is written
 
   // Enumerations that are pulled (DSP0200 5.3.2.24).
   std::chrono::seconds pullDefaultTimeout{60};
-  std::chrono::seconds pullMaxTimeout{600};  ///< a longer one is refused, and so is none at all
+  std::chrono::seconds pullMaxTimeout{600};  ///< a longer one is refused, and also a timeout of 0, which means none
   std::size_t maxPulls = 100;                ///< open at once
   std::size_t maxPullsOfClient = 25;         ///< of these, of one client
-  std::size_t maxPullObjects = 10000;        ///< the most objects that one pull may ask for
+  std::size_t maxPullObjects = 10000;        ///< the most objects that one pull may request
   std::size_t maxPullBytes = 64U << 20;      ///< what all open enumerations hold together, as response text
 };
 
@@ -47,15 +47,14 @@ class Service {
   Service(const Service&) = delete;
   Service& operator=(const Service&) = delete;
 
-  /// Carries out one request and writes its response: sink.begin is always called, or this ends by ClientGone from the
-  /// sink, the only exception that comes out. Any number of threads may call it at once; a provider that does not
-  /// return holds only the thread that called.
-  /// `caller` is who asks, as far as that is known.
-  /// Once the request is read, the sink gets a late answer: each operation has failed, for the reason given. A request
-  /// that nobody waits for any more is not read to its end.
+  /// Executes one request and writes its response. It always calls sink.begin, unless the sink throws ClientGone, the
+  /// only exception that this function throws. Any number of threads may call it at once; a provider that does not
+  /// return blocks only the calling thread. `caller` is the client, as far as it is known. Once the request is read,
+  /// the sink gets a late answer: each operation has failed, for the given reason. If the client no longer waits, the
+  /// request is not read to its end.
   void handle(const http::HttpRequest& request, http::ResponseSink& sink, const broker::Caller& caller = {});
 
-  /// Ends pulled enumerations whose client has not come back in time; cheap. They are looked at with each request too.
+  /// Ends pulled enumerations whose client did not continue them in time; cheap. Each request does this too.
   void reclaim();
 
  private:

@@ -1,5 +1,5 @@
-// The server as other programs see it: sblim's wbemcli, with each operation that it knows, against zorvacimd on a host
-// that is a file.
+// The server as other programs see it: each operation of sblim's wbemcli is run against zorvacimd on a host that is a
+// file.
 #include <fcntl.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
@@ -61,7 +61,7 @@ std::string outputOf(const std::vector<std::string>& words, int& exitCode) {
   return output;
 }
 
-/// zorvacimd on a free port, over the tree above; it ends with this.
+/// zorvacimd on a free port, over the tree above; the destructor ends it.
 class Server {
  public:
   Server() {
@@ -198,7 +198,7 @@ TEST_F(Wbemcli, ChangesOneSettingAndLeavesTheOthers) {
 }
 
 TEST_F(Wbemcli, IsToldWhatCannotBeChanged) {
-  // It sends the whole instance, and so all that has no value.
+  // It sends the whole instance, including the properties without a value.
   EXPECT_THAT(ask("mi", kSetting, {"Caption=\"x\""}), HasSubstr("(7) CIM_ERR_NOT_SUPPORTED: these properties of "
                                                                 "ZORVA_DNSSettingData cannot be changed: Caption"));
   EXPECT_THAT(ask("mi", kSetting, {"SoID=\"x\""}), HasSubstr("cannot be changed: SoID"));

@@ -48,7 +48,7 @@ bool isUtf8(std::string_view text) noexcept {
   return true;
 }
 
-/// "%3A" and the like undone; nothing where that cannot be, or the result is no UTF-8.
+/// Decodes "%3A" and the like; nothing if that is not possible, or the result is not UTF-8.
 std::optional<std::string> decoded(std::string_view text) {
   std::string out;
   for (std::size_t i = 0; i < text.size(); ++i) {
@@ -68,7 +68,7 @@ std::optional<std::string> decoded(std::string_view text) {
 
 HttpRefusal mismatch(std::string message) { return {400, "header-mismatch", std::move(message)}; }
 
-/// The number that `Man: http://www.dmtf.org/cim/mapping/http/v1.0 ; ns=73` declares; nothing where it declares none.
+/// The number that `Man: http://www.dmtf.org/cim/mapping/http/v1.0 ; ns=73` declares; nothing if it declares none.
 std::optional<std::string> declaredPrefix(const http::HttpRequest& request) {
   const std::string man = textOf(request, "Man");
   const std::size_t mapping = man.find(kMapping);
@@ -85,7 +85,7 @@ std::optional<std::string> declaredPrefix(const http::HttpRequest& request) {
   return std::string(digits);
 }
 
-/// One of CIM's own fields: once at most, percent-encoded or not.
+/// One of CIM's own fields: at most once, percent-encoded or not.
 std::optional<HttpRefusal> take(const http::HttpRequest& request, const CimHeaders& headers, std::string_view name,
                                 std::optional<std::string>& value) {
   const std::string prefixed = headers.prefix.empty() ? std::string() : headers.prefix + "-" + std::string(name);
@@ -103,11 +103,11 @@ std::optional<HttpRefusal> checkVersion(const std::optional<std::string>& versio
   return HttpRefusal{501, "unsupported-protocol-version", "the header CIMProtocolVersion must be 1.x"};
 }
 
-/// Whether the key values that the header and the body tell are the same, as far as the schema can say.
+/// Whether header and body have the same key values, as far as the schema can say.
 bool sameKeys(const broker::Broker& broker, const broker::ObjectPath& a, const broker::ObjectPath& b) {
   broker::ObjectPath one;
   broker::ObjectPath other;
-  // What is wrong with a path, the operation itself tells best.
+  // The operation itself reports best what is wrong with a path.
   if (!broker.canonicalPath(a, one).ok() || !broker.canonicalPath(b, other).ok()) return true;
   if (one.keys.size() != other.keys.size()) return false;
   for (std::size_t i = 0; i < one.keys.size(); ++i) {

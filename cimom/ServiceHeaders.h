@@ -8,12 +8,11 @@
 #include "cimxml/RequestReader.h"
 #include "http/Exchange.h"
 
-// The header fields that CIM has over HTTP (DSP0200 1.4, 6.3 and 7): what they say, and whether it is what the body
-// says.
+// The CIM header fields of HTTP (DSP0200 1.4, 6.3 and 7): reads them, and checks that they agree with the body.
 
 namespace zorva::cimom {
 
-/// An answer at the level of HTTP.
+/// A refusal at the level of HTTP.
 struct HttpRefusal {
   int status = 400;
   std::string cimError;  ///< the value of the header CIMError; may be empty
@@ -22,7 +21,7 @@ struct HttpRefusal {
 
 /// The fields of one request, decoded.
 struct CimHeaders {
-  /// With M-POST, the number that stands before the names of the fields, and before those of the response ("73").
+  /// With M-POST, the number before the names of the fields, in the request and in the response ("73").
   std::string prefix;
   bool isExtended = false;  ///< the request came by M-POST
   bool isBatch = false;
@@ -33,7 +32,7 @@ struct CimHeaders {
   std::string contentLanguage;
 };
 
-/// Reads the fields. A refusal where the request is none of CIM's, or of another version.
+/// Reads the fields. Refuses a request that is not of CIM, or of another version.
 std::optional<HttpRefusal> readHeaders(const http::HttpRequest& request, CimHeaders& headers);
 
 /// Compares the fields with the body.

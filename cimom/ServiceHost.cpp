@@ -33,7 +33,7 @@ std::string_view withoutPort(std::string_view text) noexcept {
   return isAddress ? text : text.substr(0, colon);
 }
 
-/// The bytes of an address; empty for what is none.
+/// The bytes of an address; empty if the text is not an address.
 std::string addressOf(std::string_view text) {
   const std::string copy(text.substr(0, INET6_ADDRSTRLEN));
   char bytes[sizeof(in6_addr)];
@@ -68,7 +68,7 @@ bool isOwnAddress(const std::string& address) {
 
 std::string_view firstLabel(std::string_view name) noexcept { return name.substr(0, name.find('.')); }
 
-/// The same name, or one of them the other's with a domain.
+/// True if the names are equal, or one is the other with a domain.
 bool sameHost(std::string_view a, std::string_view b) noexcept {
   if (schema::sameName(a, b)) return true;
   const bool aIsShort = a.find('.') == std::string_view::npos;

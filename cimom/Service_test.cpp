@@ -29,7 +29,7 @@ const std::string kThings = className("ClassName", "T_Thing");
 
 http::HttpRequest good() { return testing::request("EnumerateInstanceNames", kThings); }
 
-/// A good request, with one header changed, or without it where `value` is empty.
+/// A good request with one header changed, or removed if `value` is empty.
 http::HttpRequest with(const std::string& name, const std::string& value) {
   http::HttpRequest request = good();
   std::erase_if(request.headers, [&](const auto& field) { return field.first == name; });
@@ -237,7 +237,7 @@ TEST(Service, LogsEachOperationThatFails) {
                                         "root/cimv2"));
 }
 
-/// A sink whose work can be given up.
+/// A sink whose work can be abandoned.
 class ImpatientSink : public CollectingSink {
  public:
   void setLateAnswer(http::LateAnswer answer) override { late = std::move(answer); }
@@ -252,7 +252,7 @@ TEST(Service, LeavesALateAnswerInWhichEachOperationHasFailed) {
   TestService service;
   ImpatientSink sink;
   {
-    // The late answer may be asked for when the request is gone.
+    // The late answer may be written after the request is destroyed.
     const auto request = std::make_unique<http::HttpRequest>(
         post(message("<MULTIREQ>" + intrinsic("EnumerateInstanceNames", kThings) +
                      testing::extrinsic("M", testing::instanceName("T_Thing", {{"Name", "a"}}), "") + "</MULTIREQ>"),
@@ -283,7 +283,7 @@ TEST(Service, DoesNotReadOnWhereNobodyWaitsAnyMore) {
   EXPECT_FALSE(sink.late) << "what was not read has no late answer but that of HTTP";
 }
 
-/// A sink that stops its request at the first look, until it may go on.
+/// A sink that blocks its request at the first look, until the test releases it.
 class StoppingSink : public CollectingSink {
  public:
   bool isWanted() const override {

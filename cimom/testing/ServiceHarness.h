@@ -8,7 +8,7 @@
 
 #include "cimom/Service.h"
 
-// For tests: requests in two lines, and what a client gets for them.
+// For tests: requests in two lines, and their responses.
 
 namespace zorva::cimom::testing {
 
@@ -20,7 +20,7 @@ class CollectingSink : public http::ResponseSink {
   void fail(std::uint32_t cimStatus, std::string_view description) override;
   bool begun() const override { return status != 0; }
 
-  /// The value of a header; empty where there is none.
+  /// The value of a header; empty if there is none.
   std::string header(std::string_view name) const;
 
   int status = 0;
@@ -29,7 +29,7 @@ class CollectingSink : public http::ResponseSink {
   std::size_t pieces = 0;
   std::size_t largestPiece = 0;
   std::optional<std::pair<std::uint32_t, std::string>> failure;
-  std::size_t goneAfter = 0;  ///< not 0: the client goes after so many pieces
+  std::size_t goneAfter = 0;  ///< not 0: the client leaves after so many pieces
 };
 
 /// <IPARAMVALUE NAME="name">value</IPARAMVALUE>
@@ -58,9 +58,9 @@ class TestService {
  public:
   explicit TestService(ServiceOptions options = {});
 
-  /// A response of status 200 must be a valid document of CIM-XML.
+  /// A response with status 200 must be a valid document of CIM-XML.
   CollectingSink ask(const http::HttpRequest& asked);
-  /// Asks an intrinsic operation; the status must be 200.
+  /// Requests an intrinsic operation; the status must be 200.
   std::string ask(const std::string& operation, const std::string& parameters,
                   const std::string& nameSpace = "root/cimv2");
 
