@@ -18,7 +18,7 @@ http::Level levelOf(broker::LogLevel level) {
 void logServiceLine(broker::LogLevel level, std::string_view text) noexcept try {
   http::logClientLine(levelOf(level), std::string(text), "service", __FILE__, __LINE__);
 } catch (...) {
-  // Lost, as a line that cannot be written.
+  // The line is lost, like any line that cannot be written.
 }
 
 void logChange(const std::string& line) noexcept {
@@ -30,7 +30,7 @@ void logBrokerLine(broker::LogLevel level, std::string_view text) noexcept try {
     http::logLine(levelOf(level), std::string(text), "broker", __FILE__, __LINE__);
   }
 } catch (...) {
-  // Lost, as a line that cannot be written.
+  // The line is lost, like any line that cannot be written.
 }
 
 }  // namespace zorva::server

@@ -5,17 +5,17 @@
 
 #include "broker/Broker.h"
 
-// Where the lines of the broker and of the CIM operations come into the server's log. Thread-safe; nothing here throws.
+// Writes the lines of the broker and of the CIM operations to the server's log. Thread-safe; nothing here throws.
 
 namespace zorva::server {
 
-/// Takes the broker's lines, and those of the providers that go through it.
+/// Takes the broker's lines, and those that providers log through the broker.
 void logBrokerLine(broker::LogLevel level, std::string_view text) noexcept;
 
-/// Takes the lines about requests, which clients can bring about.
+/// Takes the lines about requests. Clients can cause them, so their rate is limited.
 void logServiceLine(broker::LogLevel level, std::string_view text) noexcept;
 
-/// Takes a line about a change that a client has made. None of them is left out.
+/// Takes a line about a client's change. None of them is dropped.
 void logChange(const std::string& line) noexcept;
 
 }  // namespace zorva::server

@@ -11,17 +11,17 @@
 namespace zorva::server {
 
 struct CommandLine {
-  std::string configFile;  ///< empty: the usual place
+  std::string configFile;  ///< empty: the default path
   std::optional<http::Addresses> addresses;
   std::optional<int> port;
   std::optional<int> logLevel;
   std::string agentConfig;
   std::string providerDirectory;
-  bool checkConfig = false;  ///< read the configuration, tell whether it is good, and end
-  bool greet = false;        ///< tell on standard output how to ask this server something
+  bool checkConfig = false;  ///< read the configuration, report whether it is valid, and end
+  bool greet = false;        ///< print on standard output how to send this server a request
 };
 
-/// What is to be printed instead of serving.
+/// A text to print instead of serving.
 struct Telling {
   std::string text;
   bool isError = false;
@@ -29,8 +29,8 @@ struct Telling {
 
 std::variant<CommandLine, Telling> readCommandLine(int argc, const char* const* argv);
 
-/// The configuration that the command line asks for: its file with the command line's own values in it. Throws
-/// zorva::agent::ConfigError, std::invalid_argument for an address that this server does not listen on.
+/// The configuration file of the command line, with the command line's own values instead of the file's. Throws
+/// zorva::agent::ConfigError, or std::invalid_argument for an address that this server does not listen on.
 Config configOf(const CommandLine& commandLine);
 
 }  // namespace zorva::server

@@ -29,7 +29,7 @@ constexpr int kLongestSeconds = 24 * 60 * 60;
 
 int lineOf(const toml::source_region& region) { return static_cast<int>(region.begin.line); }
 
-/// Reads one table: takes the keys that are asked for, then refuses what is left.
+/// Reads one table: takes the known keys, then refuses the rest.
 class TableReader {
  public:
   TableReader(const std::string& file, const toml::table& document, std::string name)
@@ -82,7 +82,7 @@ class TableReader {
     for (const toml::node& element : *array) value->push_back(textOf(element, key));
   }
 
-  /// Refuses the keys that nothing has taken.
+  /// Refuses the keys that were not taken.
   void finish() const {
     if (table_ == nullptr) return;
     for (const auto& [key, node] : *table_) {
@@ -195,7 +195,7 @@ void refuseUnknownTables(const Config& config, const toml::table& document) {
   }
 }
 
-/// A directory or a device is no configuration, and reading a FIFO would wait for ever.
+/// A directory or a device is not a configuration, and reading a FIFO would wait for ever.
 std::string contentsOf(const std::string& path) {
   std::error_code error;
   const std::filesystem::file_status status = std::filesystem::status(path, error);

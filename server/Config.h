@@ -9,48 +9,47 @@
 #include "http/HttpLimits.h"
 #include "http/Listener.h"
 
-// The configuration of zorvacimd: a TOML 1.0 file, and what the command line puts in its place.
+// The configuration of zorvacimd: a TOML 1.0 file, and the command line's values, which replace the file's.
 
 namespace zorva::server {
 
 struct Config {
-  std::string file;  ///< what it was read from; empty for the built-in defaults
+  std::string file;  ///< the file; empty for the built-in defaults
 
   // [listen]
-  /// Absent: 127.0.0.1 and ::1, of which the host may lack one.
+  /// Absent: 127.0.0.1 and ::1; the host may lack one of them.
   std::optional<http::Addresses> addresses;
-  int port = 5988;  ///< 0: one that is free
+  int port = 5988;  ///< 0: a free one
 
   // [limits]
   http::HttpLimits limits;
-  int nesting = 128;  ///< the most elements, one within another, in a request
+  int nesting = 128;  ///< the deepest nesting of elements in a request
 
   // [http]
-  int threads = 2;  ///< that do the input and output; not those that wait for providers
+  int threads = 2;  ///< for input and output; other threads wait for providers
 
   // [pull]
   int pullContexts = 100;        ///< enumerations that are open at once
   int pullClientContexts = 25;   ///< of these, of one client
-  int pullSeconds = 60;          ///< how long one stays open unasked where the client says nothing
-  int pullLongestSeconds = 600;  ///< the longest that a client may ask for
-  int pullMebibytes = 64;        ///< what all of them hold
+  int pullSeconds = 60;          ///< how long an idle one is kept if the client gives no timeout
+  int pullLongestSeconds = 600;  ///< the longest timeout that a client may request
+  int pullMebibytes = 64;        ///< memory of all of them
 
   // [agent]
-  std::string agentConfig;        ///< the agent's own configuration; empty: where the agent looks for it
+  std::string agentConfig;        ///< the agent's own configuration file; empty: the agent's default
   std::string providerDirectory;  ///< empty: beside the program
 
   // [log]
   int logLevel = 5000;                   ///< lines below it are dropped
-  std::optional<std::string> logTarget;  ///< absent: the agent's own
+  std::optional<std::string> logTarget;  ///< absent: the agent's default
 };
 
-/// Reads and checks a configuration. Paths that are not absolute are taken from the directory of the file. Throws
-/// zorva::agent::ConfigError, which names file, line and key, for whatever is wrong, a file that cannot be read
-/// included.
+/// Reads and checks a configuration. Relative paths start at the directory of the file. Throws
+/// zorva::agent::ConfigError, which names file, line and key, for every error, also for a file that cannot be read.
 Config readConfig(const std::string& path);
 
-/// The configuration where none is named: /etc/zorvagent/zorvacimd.toml, or the built-in defaults where that is not
-/// there. Throws as readConfig does.
+/// The configuration if no file is named: /etc/zorvagent/zorvacimd.toml, or the built-in defaults if it does not exist.
+/// Throws as readConfig does.
 Config readDefaultConfig();
 
 }  // namespace zorva::server

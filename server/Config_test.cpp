@@ -18,7 +18,7 @@ class ServerConfig : public ::testing::Test {
  protected:
   Config read(const std::string& text) { return readConfig(directory_.write("zorvacimd.toml", text)); }
 
-  /// What is wrong with it, without the directory.
+  /// The error, without the directory.
   std::string wrong(const std::string& text) {
     try {
       read(text);

@@ -46,7 +46,7 @@ constexpr std::chrono::milliseconds kNoDescriptors{100};
 
 void tellError(const std::string& text) { std::fprintf(stderr, "zorvacimd: %s\n", text.c_str()); }
 
-/// Each connection is a descriptor. What the limits on descriptors leave no room for cannot be had.
+/// Each connection needs a descriptor, so the limit on connections must fit the limit on descriptors.
 void makeRoomForConnections(http::HttpLimits& limits) {
   constexpr rlim_t kOthers = 64;
   rlimit files{};
@@ -88,7 +88,7 @@ cimom::ServiceOptions serviceOptions(const Config& config) {
   return options;
 }
 
-/// What a process that was killed left of a change is put back by who takes the lock next.
+/// If a process was killed during a change, the next holder of the lock undoes the unfinished part.
 void mendSettings() noexcept {
   try {
     const zorva::agent::SettingsLock lock(zorva::agent::dataDirectory(), zorva::agent::Access::Read);
@@ -97,12 +97,12 @@ void mendSettings() noexcept {
   }
 }
 
-/// The address as a person types it.
+/// The address in its shortest form, for people.
 std::string shortUrl(const std::string& url) {
   return url.starts_with("http://127.0.0.1:") ? "http://localhost" + url.substr(16) : url;
 }
 
-/// What GET of "/" shows.
+/// The response to GET of "/".
 std::string pageText(const std::string& url) {
   return "This is zorvacimd " ZORVA_VERSION
          ", a CIM server: it publishes the DNS client configuration of this host.\n"
@@ -136,8 +136,8 @@ class Daemon {
   std::unique_ptr<cimom::Service> service_;
   std::unique_ptr<http::HttpServer> server_;
   Clock::time_point acceptAgain_{};
-  std::size_t requestsSeen_ = 0;     ///< when it was last looked
-  std::size_t requestsTrimmed_ = 0;  ///< when memory was last given back
+  std::size_t requestsSeen_ = 0;     ///< at the last look
+  std::size_t requestsTrimmed_ = 0;  ///< when memory was last given back to the system
   Clock::time_point quietSince_ = Clock::now();
 };
 
@@ -145,7 +145,7 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
     : commandLine_(std::move(commandLine)), config_(std::move(config)) {
   makeRoomForConnections(config_.limits);
   const sigset_t signals = handledSignals();
-  ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);  // for all threads to come
+  ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);  // inherited by all later threads
   ::signal(SIGPIPE, SIG_IGN);
   signals_ = http::Descriptor(::signalfd(-1, &signals, SFD_NONBLOCK | SFD_CLOEXEC));
   if (!signals_) throw std::runtime_error(std::string("cannot wait for signals: ") + std::strerror(errno));
@@ -215,7 +215,7 @@ void Daemon::acceptFrom(const http::Listener& listener) {
   }
 }
 
-/// False: it is to end.
+/// False: the server must end.
 bool Daemon::handleSignal() {
   signalfd_siginfo signal{};
   if (::read(signals_.get(), &signal, sizeof signal) != static_cast<ssize_t>(sizeof signal)) return true;
@@ -244,7 +244,7 @@ void Daemon::reload() try {
   notifyServiceManager("READY=1");
 }
 
-/// What has to be done from time to time.
+/// Periodic work.
 void Daemon::lookAfter() {
   server_->sweep();
   service_->reclaim();
@@ -253,7 +253,7 @@ void Daemon::lookAfter() {
     requestsSeen_ = requests;
     quietSince_ = Clock::now();
   } else if (requests != requestsTrimmed_ && Clock::now() - quietSince_ > kBeforeTrim) {
-    // What large responses took is given back to the system.
+    // Memory of large responses is given back to the system.
     requestsTrimmed_ = requests;
     ::malloc_trim(0);
   }
@@ -266,7 +266,7 @@ int Daemon::timeout() const {
   return requestsTrimmed_ == 0 ? -1 : kQuietMilliseconds;
 }
 
-/// Opens the log where it goes to. A file that was not there does not stay: another user may be the one who serves.
+/// Opens the log at its target. A file that did not exist is removed again: the server may run as another user.
 void tryLog(const Config& config) {
   const std::string target = config.logTarget.value_or(zorva::agent::currentConfig().logTarget);
   const bool isFile = target.find('/') != std::string::npos;
@@ -288,7 +288,7 @@ void tryProviders(const Config& config, const MakeBroker& makeBroker, std::vecto
   for (std::string& each : makeBroker(config)->openLibraries()) problems.push_back(std::move(each));
 }
 
-/// Reads and opens what a start would, and says all that is wrong.
+/// Reads and opens what a start would, and reports all errors.
 int check(const Config& config, const MakeBroker& makeBroker) {
   zorva::agent::loadConfig(config.agentConfig);
   std::vector<std::string> problems;
@@ -307,7 +307,7 @@ int check(const Config& config, const MakeBroker& makeBroker) {
 int serve(const CommandLine& commandLine, const MakeBroker& makeBroker) {
   Config config = configOf(commandLine);
   if (commandLine.checkConfig) return check(config, makeBroker);
-  // A few heaps for all threads: more would hold memory for each of them.
+  // Few heaps for all threads: with more, each thread would hold its own memory.
   ::mallopt(M_ARENA_MAX, 2);
   zorva::agent::loadConfig(config.agentConfig);
   applyLog(config);

@@ -6,18 +6,18 @@
 #include "broker/Broker.h"
 #include "server/CommandLine.h"
 
-// The server as a process: its sockets, signals, log, and the word with the service manager.
+// The server as a process: its sockets, signals, log, and messages to the service manager.
 
 namespace zorva::server {
 
-/// Makes the broker that answers.
+/// Makes the broker that serves the requests.
 using MakeBroker = std::function<std::unique_ptr<broker::Broker>(const Config&)>;
 
-/// The classes and providers of this project, the libraries from where the configuration says or beside the program.
+/// The classes and providers of this project. The libraries are in the configured directory or beside the program.
 std::unique_ptr<broker::Broker> makeBuiltInBroker(const Config& config);
 
-/// The whole of main(): reads the arguments, serves until it is told to end, returns the exit status. To be called
-/// before the process has other threads.
+/// The whole of main(): reads the arguments, serves until a signal ends it, returns the exit status. Call it before the
+/// process has other threads.
 int runServer(int argc, const char* const* argv, const MakeBroker& makeBroker);
 
 }  // namespace zorva::server

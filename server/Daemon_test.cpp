@@ -1,4 +1,4 @@
-// zorvacimd as it runs: hostile requests, signals, sockets that are handed over, the word with the service manager.
+// The running zorvacimd: hostile requests, signals, inherited sockets, messages to the service manager.
 #include <arpa/inet.h>
 #include <fcntl.h>
 #include <gmock/gmock.h>
@@ -31,7 +31,7 @@ using testing::TestDaemon;
 
 const std::string kEndpoints = http::testing::enumeration("EnumerateInstanceNames", "ZORVA_DNSProtocolEndPoint");
 
-/// Asks for the endpoints; the names of the interfaces are in the answer.
+/// Requests the endpoints; the response contains the names of the interfaces.
 std::string endpoints(int port) {
   Wire wire(port);
   wire.send(kEndpoints);
@@ -68,7 +68,7 @@ TEST(Daemon, AnswersMPostWithAnEmptyExt) {
   EXPECT_EQ(response.headers.at("ext"), "");
 }
 
-/// A message with one call, and what the answer to it holds from the first INSTANCENAME on to its end.
+/// A message with one call, and its response from the first INSTANCENAME to the end.
 std::string firstName(int port, const std::string& method, const std::string& object, const std::string& call) {
   Wire wire(port);
   wire.send(
@@ -129,7 +129,7 @@ struct Hostile {
   const char* name;
   std::string bytes;
   int status;          ///< 0: the connection is closed without an answer
-  const char* logged;  ///< part of a line of the log; null: none is made
+  const char* logged;  ///< part of a line of the log; null: no line
 };
 
 std::string withHead(const std::string& fields, const std::string& body = {}) {
@@ -180,7 +180,7 @@ TEST(HostileRequests, EachGetsItsAnswerAndALineAndTheServerGoesOn) {
     SCOPED_TRACE(hostile.name);
     const std::size_t logged = daemon.log().size();
     Wire wire(daemon.port());
-    // The answer may come, and the connection go, before all of it is sent.
+    // The response may arrive, and the connection end, before all of it is sent.
     wire.send(hostile.bytes);
     const WireResponse response = wire.receive(seconds(5));
     if (hostile.status >= 0) {
@@ -195,7 +195,7 @@ TEST(HostileRequests, EachGetsItsAnswerAndALineAndTheServerGoesOn) {
       }
       EXPECT_THAT(lines, HasSubstr(hostile.logged));
     }
-    std::this_thread::sleep_for(milliseconds(60));  // only so many such lines are written in a second
+    std::this_thread::sleep_for(milliseconds(60));  // the number of such lines per second is limited
   }
   EXPECT_THAT(endpoints(daemon.port()), HasSubstr("eth0"));
 }
@@ -253,7 +253,7 @@ std::vector<std::string> largeRequests() {
   };
 }
 
-/// Lets some clients send large requests, and counts the small ones that are answered meanwhile.
+/// Lets some clients send large requests, and counts the small ones that are answered in the meantime.
 int answersBeside(int port, const std::vector<std::string>& large) {
   std::atomic<std::size_t> running = large.size();
   std::vector<std::thread> clients;
@@ -380,7 +380,7 @@ TEST(DaemonProcess, MovesToANewLogFileWhenItReadsItsConfigurationAgain) {
   EXPECT_TRUE(daemon.logs("the configuration was read again"));
 }
 
-/// A datagram socket in the place of a service manager's.
+/// A datagram socket that replaces the service manager's.
 class NotifySocket {
  public:
   NotifySocket() : path_(directory_ / "notify"), socket_(::socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0)) {
@@ -417,7 +417,7 @@ TEST(DaemonProcess, TellsTheServiceManagerHowItFares) {
   EXPECT_EQ(daemon.exitCodeWithin(seconds(20)), 0);
 }
 
-/// Listens on an address and hands that on as descriptor 3, as a service manager does.
+/// Listens on an address and passes the socket on as descriptor 3, as a service manager does.
 void handOver(const char* address) {
   const int socket = ::socket(AF_INET, SOCK_STREAM, 0);
   sockaddr_in name{};

@@ -19,7 +19,7 @@ namespace {
 
 constexpr int kMostSockets = 64;
 
-/// The value as a number; -1 where it is none.
+/// The value as a number; -1 if it is none.
 long number(const char* text) {
   if (text == nullptr) return -1;
   long value = -1;
@@ -38,7 +38,7 @@ void notifyServiceManager(std::string_view state) {
   const std::size_t size = std::strlen(path);
   if (size >= sizeof address.sun_path) return;
   std::memcpy(address.sun_path, path, size);
-  if (*path == '@') address.sun_path[0] = '\0';  // a name that is in no directory
+  if (*path == '@') address.sun_path[0] = '\0';  // the abstract namespace: not a file
 
   const http::Descriptor socket(::socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0));
   if (!socket) return;

@@ -25,7 +25,7 @@ constexpr const char* kTree = R"({"system_name":"host1","nodes":[
         "name":"eth0","host_name":"host1","domain_name":"example.org","dns_suffixes":["example.org"],
         "dns_server_addresses":["192.0.2.53"],"protocol_if_type":4097,"enabled_state":1}}]}]}]})";
 
-/// Becomes the program; the descriptors stand in for its output.
+/// Replaces this process by the program; the descriptors become its output.
 [[noreturn]] void become(const std::vector<std::string>& arguments, int out, int err) {
   ::dup2(out, STDOUT_FILENO);
   ::dup2(err, STDERR_FILENO);
@@ -39,7 +39,7 @@ constexpr const char* kTree = R"({"system_name":"host1","nodes":[
 
 int exitCodeOf(int status) { return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status); }
 
-/// The first line that comes, or what came until then.
+/// The first line that arrives, or the text received until the time is over.
 std::string firstLine(int descriptor, std::chrono::seconds most) {
   const auto deadline = Clock::now() + most;
   std::string text;

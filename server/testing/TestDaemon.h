@@ -15,17 +15,17 @@
 
 namespace zorva::server::testing {
 
-/// How a run that ends by itself ended.
+/// The result of a run that ends by itself.
 struct DaemonOutcome {
-  int exitCode = -1;  ///< 128 and the number where a signal ended it
+  int exitCode = -1;  ///< 128 and the number if a signal ended it
   std::string out;
   std::string err;
 };
 
 class TestDaemon {
  public:
-  /// `config` is the text of zorvacimd.toml; the log goes to a file. Port 0 of 127.0.0.1, unless `arguments` say
-  /// otherwise. `prepare` runs in the child before the program. Waits until it tells its address.
+  /// `config` is the text of zorvacimd.toml; the log is a file. Listens on port 0 of 127.0.0.1, unless `arguments` say
+  /// otherwise. `prepare` runs in the child before the program. Waits until the server prints its address.
   explicit TestDaemon(const std::string& config = {}, std::vector<std::string> arguments = {},
                       const std::function<void()>& prepare = {});
   ~TestDaemon();
@@ -38,7 +38,7 @@ class TestDaemon {
 
   void signal(int number) const;
 
-  /// Waits for it to end; -1 where it does not within that time.
+  /// Waits for it to end; -1 if it does not within that time.
   int exitCodeWithin(std::chrono::milliseconds most);
 
   std::string log() const;
