@@ -90,7 +90,7 @@ int DNSClient::setDNSDomain(std::string domain) {
 
 int DNSClient::setDNSSuffixSearchOrder(std::vector<std::string>) { return 0; }
 
-// The new places go into copies that are dropped: the order of the host's servers is not this record's to change.
+// The new order goes into copies that are dropped: this record must not change the order of the host's servers.
 int DNSClient::setDNSServerSearchOrder(std::vector<std::string> addresses) {
   std::map<std::string, DNSServer> dnsServerMap;
   if (getDNSServerInstances(dnsServerMap) != 0) return 1;
@@ -107,7 +107,7 @@ int DNSClient::setDNSServerSearchOrder(std::vector<std::string> addresses) {
 
 namespace {
 
-// The walk survives every failure in here: the record goes on to its next field and is stored.
+// The walk survives every failure in here: the record continues with its next field and is stored.
 void warnUnless(bool usable, const LogSite& site, const char* text) {
   if (!usable) logMessage(loggerDNSClient, site, LOG_LEVEL_DETAIL, text);
 }
@@ -152,14 +152,14 @@ void addClient(Instrumentation& cursor, const LogSite& site, std::map<std::strin
     warnUnless(client.setDNSSuffixesToAppend(suffixes), site, "Failed while setting DNSSuffixesToAppend");
   }
   warnUnless(client.setDNSSCCN(systemClassOf(cursor, site)), site, "Failed while setting System Creation Class Name");
-  dnsClientMap[key] = client;  // the last node of a name wins
+  dnsClientMap[key] = client;  // of several nodes with one name the last is kept
 }
 
 }  // namespace
 
 unsigned short getDNSClientInstances(std::map<std::string, DNSClient>& dnsClientMap) {
   logEntry(loggerDNSClient, ZV_HERE, " dnsClientMap=", &dnsClientMap);
-  Instrumentation cursor;  // outside the guarded stretch: what it throws passes out
+  Instrumentation cursor;  // outside the try block: its exceptions leave this function
   try {
     cursor.selectNode(NodeLexicon::NODE_NETWORK_IP_CONFIG);
     if (!cursor) {

@@ -7,8 +7,8 @@
 
 namespace ZV {
 
-// A value record; a copy is made for every use. The bool of a setter tells whether the value is usable; it is stored in
-// any case. The numbers that the host does not tell are 0.
+// A value record; it is copied for every use. The bool of a setter says whether the value is usable; it is stored in
+// any case. Numbers that the host does not provide are 0.
 class DNSClient {
  public:
   std::string getDNSClientName() const { return dnsClientName; }
@@ -21,7 +21,7 @@ class DNSClient {
   unsigned short getRequestedState() const { return requestedState; }
   std::vector<std::string> getDNSSuffixesToAppend() const { return dnsSuffixesToAppend; }
 
-  // These write their field on read, which is why they are not const.
+  // These store their value when it is first read, so they are not const.
   std::string getNameFormat();            // "NICName"
   std::string getOtherTypeDescription();  // "DNS"
 
@@ -31,20 +31,21 @@ class DNSClient {
   bool setDomainName(std::string domain);  // blanks and tabs at its ends are stripped first
   bool setDNSSCCN(std::string className);
 
-  // Whatever the type, the endpoint's ProtocolIFType is 1: Other.
+  // The type is ignored: the endpoint's ProtocolIFType is always 1, Other.
   bool setprotocolIFType(unsigned int type);
 
   // Takes the host's raw state and stores CIM's EnabledState: 1 gives 2 (Enabled), 12 gives 6 (Enabled but Offline), 16
   // gives 3 (Disabled), any other 5 (Not Applicable).
   bool setEnabledState(unsigned short rawState);
 
-  // Whatever the state, RequestedState is 12: Not Applicable.
+  // The state is ignored: RequestedState is always 12, Not Applicable.
   bool setRequestedState(unsigned short rawState);
 
   bool setDNSSuffixesToAppend(std::vector<std::string> suffixes);
 
-  // What the extrinsic methods end in. They answer 0 for done and 1 for failed, and change nothing on the host.
-  int setDNSDomain(std::string domain);  // stores it in this record alone, unstripped
+  // The implementation of the extrinsic methods. They return 0 for done and 1 for failed, and change nothing on the
+  // host.
+  int setDNSDomain(std::string domain);  // stores it only in this record, unstripped
   int setDNSSuffixSearchOrder(std::vector<std::string> suffixes);
   int setDNSServerSearchOrder(std::vector<std::string> addresses);
 
@@ -63,8 +64,9 @@ class DNSClient {
 };
 
 // Adds a record for each network interface node to dnsClientMap, keyed by the interface's name; the map is not emptied
-// first. Of nodes with one name the last one stays. 0 on success; 1 where the tree has no such node, or where it threw;
-// the map then holds what was reached. An exception that is not a std::exception passes out.
+// first. Of several nodes with one name the last one is kept. Returns 0 on success. Returns 1 if the tree has no such
+// node, or if it threw; the map then contains the records read before. An exception that is not a std::exception leaves
+// the function.
 unsigned short getDNSClientInstances(std::map<std::string, DNSClient>& dnsClientMap);
 
 }  // namespace ZV

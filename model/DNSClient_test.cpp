@@ -151,7 +151,7 @@ TEST(DNSClientSearchOrder, FailsWhereTheServersCannotBeRead) {
   EXPECT_EQ(1, DNSClient().setDNSServerSearchOrder({}));
 }
 
-// The walk over what is installed, what it answered, what it found and what it logged.
+// The walk over the installed tree, its return value, its records and its log lines.
 struct Walk {
   unsigned short answer = 0;
   std::map<std::string, DNSClient> found;
@@ -168,7 +168,7 @@ struct Walk {
     for (const auto& [name, client] : found) all.push_back(name);
     return all;
   }
-  // The failures that it survived, without the values that it told.
+  // The failures that it survived, without the logged values.
   std::vector<std::string> warnings() const { return lines.ofKind(LineKind::Message).texts(4000); }
 };
 
@@ -354,7 +354,7 @@ TEST(DNSClientWalk, EveryLaterFailureOfTheTreeIsCaughtAndKeepsWhatWasReached) {
       } catch (const std::runtime_error&) {
         EXPECT_EQ(Thrown::StdException, thrown);
       } catch (int) {
-        EXPECT_EQ(Thrown::Int, thrown);  // what is no std::exception passes out
+        EXPECT_EQ(Thrown::Int, thrown);  // an exception that is no std::exception leaves the function
       }
       return;
     }

@@ -43,13 +43,13 @@ void addServers(const std::vector<std::string>& addresses, const LogSite& site,
   unsigned short order = 1;
   for (const std::string& address : addresses) {
     logVariable(loggerDNSClient, site, "name", address);
-    if (!address.empty() && !dnsServerMap.contains(address)) {  // the first node that names an address wins
+    if (!address.empty() && !dnsServerMap.contains(address)) {  // the first node that names an address is kept
       DNSServer server;
       server.setAccessInfo(address);
       server.setOrderOfAccess(order);
       dnsServerMap[address] = server;
     }
-    ++order;  // an address that was skipped has its place all the same
+    ++order;  // a skipped address counts too
   }
 }
 

@@ -57,7 +57,7 @@ TEST(DNSServer, OrderIsStored) {
   EXPECT_EQ(0, server.getOrderOfAccess());
 }
 
-// The walk over what is installed, what it answered, what it found and what it logged.
+// The walk over the installed tree, its return value, its records and its log lines.
 struct Walk {
   unsigned short answer = 0;
   std::map<std::string, DNSServer> found;
@@ -68,7 +68,7 @@ struct Walk {
     answer = getDNSServerInstances(found);
     lines = logger.pairs();
   }
-  // Addresses with their places, in the order of the map.
+  // Addresses with their positions, in the order of the map.
   std::vector<std::pair<std::string, int>> places() const {
     std::vector<std::pair<std::string, int>> all;
     for (const auto& [address, server] : found) {
@@ -170,7 +170,7 @@ TEST(DNSServerWalk, EveryFailureOfTheTreeIsCaughtAndKeepsWhatWasReached) {
     if (thrown == Thrown::Int) {
       try {
         getDNSServerInstances(found);
-      } catch (int) {  // what is no std::exception passes out
+      } catch (int) {  // an exception that is no std::exception leaves the function
         EXPECT_FALSE(logger.pairs().exited("getDNSServerInstances"));
       }
       return;
@@ -180,8 +180,8 @@ TEST(DNSServerWalk, EveryFailureOfTheTreeIsCaughtAndKeepsWhatWasReached) {
     EXPECT_EQ(answer == 0 ? 0U : 1U, logger.pairs().errors().size());
     reached.push_back(found.size());
   });
-  // making the cursor, placing it, and for each node a test, its list and the step to the next; the last test; no
-  // failure at all
+  // The failing calls: making the cursor, placing it, then for each node a test, its list and the step to the next; the
+  // last test; no failure at all.
   EXPECT_THAT(reached, ElementsAre(0, 0, 0, 0, 1, 1, 1, 2, 2, 2));
 }
 
