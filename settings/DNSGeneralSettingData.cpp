@@ -6,7 +6,7 @@
 
 namespace ZV {
 
-// The category of its sibling: operators see the two setting classes as one.
+// The category of DNSSettingData: operators see the two setting classes as one.
 static const std::string loggerDNSGeneralSettingData = "Zorvagent.DNSSettingDataProvider";
 
 DNSGeneralSettingData::DNSGeneralSettingData() {
@@ -74,7 +74,7 @@ bool DNSGeneralSettingData::getConfigurationName(std::string& value) {
   return true;
 }
 
-// True also where the node has no suffixes, unlike the server addresses of the sibling.
+// Returns true even if the node has no suffixes.
 bool DNSGeneralSettingData::getDNSSuffixesToAppend(std::vector<std::string>& values) {
   const std::string fileName = getFileName();
   if (interfaceFileExists(fileName)) {

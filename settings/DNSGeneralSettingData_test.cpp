@@ -17,7 +17,7 @@ constexpr const char* kBothKeys = "CONFIG_NAME=office\nDNSSUFFIXES=lab.example.o
 
 class DNSGeneralSettingDataTest : public ::testing::Test {
  protected:
-  // The cursor on the node that speaks for the host.
+  // The cursor on the node whose settings are the host's.
   DNSGeneralSettingData found() {
     world_.install();
     DNSGeneralSettingData data;
@@ -39,7 +39,7 @@ class DNSGeneralSettingDataTest : public ::testing::Test {
 
 using Text = bool (DNSGeneralSettingData::*)(std::string&);
 
-// What a getter says, with what its output holds: "before" where it was left as it was.
+// The result of a getter, with its output: "before" if it was not changed.
 std::pair<bool, std::string> get(DNSGeneralSettingData data, Text getter) {
   std::string value = "before";
   const bool given = (data.*getter)(value);
@@ -156,7 +156,7 @@ TEST_F(DNSGeneralSettingDataTest, WhateverSelectingThrowsIsCaughtAndAllElseFlies
   EXPECT_GT(tried, 14U);
 }
 
-// --- what it says
+// --- values
 
 TEST_F(DNSGeneralSettingDataTest, ItsInstanceIDIsTheNameOfTheInterface) {
   EXPECT_EQ(std::pair(true, "eth0"s), get(atUsualNic(), &DNSGeneralSettingData::getInstanceID));

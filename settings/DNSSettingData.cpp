@@ -47,7 +47,7 @@ bool DNSSettingData::getDescription(std::string& value) {
   return true;
 }
 
-// No link to the boot protocol.
+// Not derived from the boot protocol.
 bool DNSSettingData::getAddressOrigin(unsigned short& value) {
   value = 2;
   return true;
@@ -55,7 +55,7 @@ bool DNSSettingData::getAddressOrigin(unsigned short& value) {
 
 namespace {
 
-// Empty where the node has no such property.
+// Empty if the node has no such property.
 template <typename Value>
 bool readProperty(Instrumentation& node, NodeLexicon::Properties property, Value& value) {
   value.clear();

@@ -1,4 +1,4 @@
-// A cursor over the host's network interfaces that answers for the DNS setting data of each.
+// A cursor over the host's network interfaces that reads and writes the DNS setting data of each.
 #pragma once
 
 #include <Instrumentation.h>
@@ -8,21 +8,21 @@
 
 namespace ZV {
 
-// Stands on the first interface once built; a loop asks operator bool once for each interface and then goes on with
-// operator++. A copy stands on the same node. Belongs to one operation and one thread. Exceptions of the
-// instrumentation pass out.
+// After construction it is on the first interface. A loop calls operator bool once for each interface and then
+// operator++. A copy is on the same node. Belongs to one operation and one thread. Exceptions of the instrumentation
+// leave its functions.
 //
-// No member is const: the cursor's own members need not be.
+// No member is const, because the cursor's own members need not be const.
 //
-// A getter returns false where the value is not to be set on an instance; its output is then untouched, or empty where
-// the node was asked in the place of the file. The readers of the interface's file rely on operator bool having run for
-// the node.
+// A getter returns false if the value must not be set on an instance. Its output is then unchanged, or empty if the
+// value was read from the node instead of the file. The getters that read the interface's file require that operator
+// bool was called for the node.
 class DNSSettingData : public Instrumentation {
  public:
   DNSSettingData();
 
-  // Whether the cursor stands on an interface, those of the service processor and those without a name included. Finds
-  // the interface's file; a node without a name keeps the file of the one before.
+  // Whether the cursor is on an interface; interfaces of the service processor and those without a name count. Finds
+  // the interface's file; a node without a name keeps the file of the previous one.
   explicit operator bool();
   DNSSettingData& operator++();
 
@@ -34,8 +34,8 @@ class DNSSettingData : public Instrumentation {
   bool getDescription(std::string& value);
   bool getAddressOrigin(unsigned short& value);
 
-  // From the file while there is one, a missing key as empty text; else from the node, false and empty where that has
-  // none. The boot protocol and the configuration's name stand in the file alone.
+  // From the file if it exists; a missing key gives the empty text. Else from the node; false and empty if it has no
+  // value. The boot protocol and the configuration's name are only in the file.
   bool getBootProtocol(std::string& value);
   bool getDomainName(std::string& value);
   bool getRequestedHostname(std::string& value);
@@ -43,14 +43,14 @@ class DNSSettingData : public Instrumentation {
   bool getDNSServerAddresses(std::vector<std::string>& values);
 
   bool getDHCPOptionsToUse(std::vector<unsigned short>& values);  // appended
-  bool getUseSuffixWhenRegistering(bool& value);                  // true, and leaves value as it is
+  bool getUseSuffixWhenRegistering(bool& value);                  // true, and value is unchanged
   bool getRegisterThisConnectionsAddress(bool& value);            // false
 
-  // Write to the node; true when it is stored there.
+  // Write to the node; true if it is stored there.
   bool setRequestedHostname(std::string value);
   bool setDomainName(std::string value);
   bool setDNSServerAddresses(std::vector<std::string> values);
-  // Writes to the file, adding the key where it is missing; always true.
+  // Writes to the file, adding the key if it is missing; always true.
   bool setConfigurationName(const std::string& value);
 
  private:

@@ -38,7 +38,7 @@ class DNSSettingDataTest : public ::testing::Test {
 
 using Text = bool (DNSSettingData::*)(std::string&);
 
-// What a getter says, with what its output holds: "before" where it was left as it was.
+// The result of a getter, with its output: "before" if it was not changed.
 std::pair<bool, std::string> get(DNSSettingData data, Text getter) {
   std::string value = "before";
   const bool given = (data.*getter)(value);
@@ -236,7 +236,7 @@ struct Scalar {
   const char* inFile;
   std::pair<bool, std::string> fromNode;      // of a usual interface without a file
   std::pair<bool, std::string> fromBareNode;  // of an interface with nothing but a name
-  const char* variable;                       // under which the log tells it
+  const char* variable;                       // its name in the log
 };
 
 const Scalar kScalars[] = {

@@ -22,7 +22,7 @@ bool interfaceFileExists(const std::string& fileName) { return File::exists(make
 
 namespace {
 
-// Hands the value of a key to take while the reader is open. A reader that did not open has no keys, so its value is
+// Calls take with the value of a key while the reader is open. A reader that did not open has no keys, so its value is
 // the empty text too.
 template <typename Take>
 void readValue(const std::string& fileName, const char* key, Take take) {
@@ -77,7 +77,7 @@ std::string lineOf(const std::string& key, const std::string& value) {
   return std::string(key.c_str()) + "=" + value.c_str() + "\n";  // NOLINT(readability-redundant-string-cstr)
 }
 
-// Replaces every line that holds the key; what appendAbsent is for, see modifyValue.
+// Replaces every line that contains the key. For appendAbsent see modifyValue.
 void rewrite(const std::string& fileName, const std::string& key, const std::string& value, bool appendAbsent) {
   if (!isRegularFile(fileName)) return;
   Stream in(std::fopen(fileName.c_str(), "r"));
@@ -90,7 +90,7 @@ void rewrite(const std::string& fileName, const std::string& key, const std::str
     pieces.push_back(matches ? lineOf(key, value) : std::string(buffer));
     matched = matched || matches;
   }
-  if (std::ferror(in.get()) != 0) return;  // what could not be read must not be lost
+  if (std::ferror(in.get()) != 0) return;  // unread text must not be lost
   in.reset();
   if (!matched && appendAbsent) pieces.push_back(lineOf(key, value));
 

@@ -29,13 +29,13 @@ using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 using std::string_literals::operator""s;
 
-constexpr std::size_t kPiece = 511;  // the longest piece that a rewriter reads at once
+constexpr std::size_t kPiece = 511;  // the longest piece that is read at once
 
 std::string scalarOf(const std::string& fileName, const char* key) {
   return readScalar(fileName, key, loggerDNSSettingData, ZV_HERE, "value");
 }
 
-// Reports go to what they stand for, not into a page of text.
+// Keeps failure messages short: a long run of one byte is shown as its length.
 std::string brief(const std::string& bytes) {
   return std::to_string(bytes.size()) + " bytes: " + inQuotes(bytes.substr(0, 2000));
 }
@@ -45,8 +45,8 @@ std::string brief(const std::string& bytes) {
                                        << (found.has_value() ? brief(*found) : "no file");
 }
 
-// What a rewrite makes of a file, told in another way than the rewriters go: text is cut behind each line feed and
-// after 511 bytes, and what a cut gives ends at its first NUL.
+// An independent model of a rewrite: text is cut after each line feed and after 511 bytes, and each piece ends at its
+// first NUL.
 std::string rewritten(const std::string& content, const std::string& key, const std::string& value) {
   std::string all;
   for (std::size_t start = 0; start < content.size();) {
@@ -60,7 +60,7 @@ std::string rewritten(const std::string& content, const std::string& key, const 
   return all;
 }
 
-// The rewriters never wait; a test that does is ended by this.
+// The rewriters never wait. This ends a test that does.
 class Deadline {
  public:
   Deadline() { ::alarm(20); }
@@ -71,7 +71,7 @@ class InterfaceFileTest : public ::testing::Test {
  protected:
   InterfaceFileTest() { world_.nic("eth0").install(); }
 
-  // The file's bytes after a value was written into a file of that content.
+  // The file's bytes after a value was written into a file with that content.
   std::optional<std::string> afterModifyDNSValue(const std::string& content, const std::string& key,
                                                  const std::string& value) {
     world_.file("eth0", content);
@@ -282,7 +282,7 @@ TEST_F(InterfaceFileTest, ARewriteLeavesNothingElseInTheDirectory) {
   EXPECT_THAT(names, ElementsAre("ifcfg-eth0"));
 }
 
-// --- values that nobody should send
+// --- hostile values
 
 TEST_F(InterfaceFileTest, QuotesBackslashesAndPercentSignsAreWrittenAsTheyAre) {
   const std::string value = R"("a" 'b' \n %s %n `c` $(d))";
@@ -328,7 +328,7 @@ TEST_F(InterfaceFileTest, AListOfAHundredThousandElementsIsReadBack) {
   EXPECT_EQ(elements, values);
 }
 
-// --- files that nobody should write
+// --- hostile files
 
 class LineLength : public InterfaceFileTest, public ::testing::WithParamInterface<std::size_t> {};
 
@@ -443,7 +443,7 @@ TEST_F(InterfaceFileTest, ADeviceReadsAsAnEmptyFile) {
   modifyInBothWays();
 }
 
-// Files are opened as an unprivileged user until this ends.
+// Until it is destroyed, files are opened as an unprivileged user.
 class Unprivileged {
  public:
   explicit Unprivileged(const std::string& directory) {
@@ -479,7 +479,7 @@ TEST_F(InterfaceFileTest, AFileThatCannotBeWrittenKeepsItsOldContents) {
 
 // --- no room
 
-// No file of this process grows beyond that size until this ends.
+// Until it is destroyed, no file of this process grows beyond that size.
 class FileSizeLimit {
  public:
   explicit FileSizeLimit(rlim_t bytes) : oldHandler_(std::signal(SIGXFSZ, SIG_IGN)) {
@@ -548,7 +548,7 @@ TEST_F(InterfaceFileTest, OfTwoShortRewritesOfOneLengthAtOnceOneOrBothMayLose) {
     std::thread other(write, "one");
     write("two");
     other.join();
-    // One may have found the file when the other had just emptied it.
+    // One may have read the file when the other had just emptied it.
     EXPECT_THAT(world_.fileContent("eth0"), AnyOf("HOSTNAME=one\n", "HOSTNAME=two\n", ""));
   }
 }

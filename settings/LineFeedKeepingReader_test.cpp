@@ -1,5 +1,5 @@
-// The readers of interface files over another agent, whose property files leave the line feed on a value. Its class
-// stands in for the agent's own in this program.
+// The readers of interface files with another agent, whose property files keep the line feed at the end of a value. Its
+// class replaces the agent's own in this program.
 #include <PropertyFile.h>
 #include <StringConversion.h>
 #include <gmock/gmock.h>
@@ -93,7 +93,7 @@ TEST_F(LineFeedKeepingReader, IsOpenedForReadingAndClosedBeforeItEnds) {
   EXPECT_THAT(calls, ElementsAre("open 1", "getValue DNSSERVERS", "close", "end"));
 }
 
-// Writes the lines of the log among the calls of the reader.
+// Inserts the log lines among the calls of the reader.
 class LogAmongCalls : private zorva::agent::LogSink {
  public:
   LogAmongCalls() { zorva::agent::setLogSink(this); }

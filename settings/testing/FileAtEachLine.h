@@ -10,7 +10,7 @@
 
 namespace ZV::Test {
 
-// What a file holds at each line of the log.
+// The contents of a file at each log line.
 class FileAtEachLine : private zorva::agent::LogSink {
  public:
   FileAtEachLine(const World& world, std::string interface) : world_(world), interface_(std::move(interface)) {
