@@ -1,4 +1,4 @@
-// The forms of every line that the library writes to the agent's logger.
+// The format of every line that the library writes to the agent's logger.
 #pragma once
 
 #include <ZALogger.h>
@@ -11,21 +11,21 @@
 
 namespace ZV {
 
-// Selects the form of a line. A value that is not listed gives the entering form.
+// Selects the format of a line. A value that is not listed gives the entering format.
 enum MessageType : int { MSG_ENTERING = 0, MSG_EXITING = 1, MSG_METHOD = 2, MSG_MESSAGE = 3 };
 
-// Levels that the library writes at. What the logger drops is the logger's business; no level is tested here.
+// The levels that the library writes at. The library tests no level: the logger drops lines.
 enum LogLevel : int {
   LOG_LEVEL_FLOW = 3000,    // entry and exit lines with a parameter list
   LOG_LEVEL_DETAIL = 4000,  // banners, provider entry and exit, values, failures that a walk survives
   LOG_LEVEL_ERROR = 6000,   // failures that end or empty an operation
 };
 
-// A line is cut where its buffer ends.
+// A longer line is truncated.
 constexpr std::size_t kMessageBufferSize = 512;
 
-// The four formatters. Each returns its own buffer, so that two of them never share one; the buffers are one set for
-// each thread, and a line stays valid until the same formatter runs again on its thread. Null text prints as "(null)".
+// The four formatters. Each returns its own buffer, one for each thread. A line is valid until the same formatter runs
+// again on its thread. Null text prints as "(null)".
 
 inline const char* trace(const char* text, const char* file, unsigned int line, MessageType type) {
   static thread_local char messageBuffer[kMessageBufferSize];
@@ -87,17 +87,17 @@ struct Place {
   }
 };
 
-// The function that a line names, and its place.
+// The function that a line names, and its source file and line.
 struct LogSite {
   const char* function;
   const char* file;
   unsigned int line;
 };
 #define ZV_HERE ZV_HERE_IN(static_cast<const char*>(__func__))
-// For a lambda, whose own name would stand in the place of the function's.
+// For a lambda: its own name would replace the function's.
 #define ZV_HERE_IN(function) (::ZV::LogSite{function, __FILE__, __LINE__})
 
-// A log pair: the same line to the log and then to the trace. format is called afresh for each half.
+// A log pair: the same line to the log and then to the trace. format is called for each of the two.
 template <typename Format>
 void logPair(const std::string& logger, const LogSite& site, int level, Format format) {
   {
@@ -128,7 +128,7 @@ inline void logVariable(const std::string& logger, const LogSite& site, const ch
   logPair(logger, site, LOG_LEVEL_DETAIL, [&] { return trace(name, site.file, site.line, value); });
 }
 
-// One label or value of a parameter list: text as it stands, a bool through the stream, of anything else the address.
+// One label or value of a parameter list: text unchanged, a bool as the stream prints it, anything else as its address.
 template <typename T>
 void appendParameter(ZALog::ZAMessageBuffer& buffer, const T& labelOrValue) {
   if constexpr (std::is_same_v<T, bool>) {
@@ -141,7 +141,7 @@ void appendParameter(ZALog::ZAMessageBuffer& buffer, const T& labelOrValue) {
   }
 }
 
-// A line with a parameter list of labels and values in turn: logEntry(logger, ZV_HERE, " broker=", broker, " ref=",
+// A line with a parameter list, labels and values alternating: logEntry(logger, ZV_HERE, " broker=", broker, " ref=",
 // ref).
 template <typename... LabelsAndValues>
 void logWithParameters(const std::string& logger, const LogSite& site, MessageType type,
@@ -163,8 +163,8 @@ void logExit(const std::string& logger, const LogSite& site, const LabelsAndValu
   logWithParameters(logger, site, MSG_EXITING, labelsAndValues...);
 }
 
-// The entry line of a function, which its making writes, and, where the function asks for it, the exit line with the
-// same parameters.
+// Writes the entry line of a function when it is constructed, and the exit line with the same parameters when exit() is
+// called.
 template <typename... LabelsAndValues>
 class FlowLog {
  public:
@@ -189,7 +189,8 @@ FlowLog(const std::string&, const LogSite&, LabelsAndValues...) -> FlowLog<Label
 inline constexpr const char* kBanner = "==============================================================================";
 static_assert(std::char_traits<char>::length(kBanner) == 78);
 
-// Frame a provider operation in the log. The lines tell of the operation, the logger's own arguments of this header.
+// Frame a provider operation in the log. The text of the lines names the operation; the place that the logger gets is
+// in this header.
 inline void markProviderEntry(const std::string& logger, const char* function, const char* file, unsigned int line) {
   logPair(logger, ZV_HERE, LOG_LEVEL_DETAIL, [] { return kBanner; });
   logPair(logger, ZV_HERE, LOG_LEVEL_DETAIL, [&] { return trace(function, file, line, MSG_ENTERING); });

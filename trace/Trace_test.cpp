@@ -41,7 +41,7 @@ TEST(TraceForms, MessageTypesHaveTheirNumbers) {
 }
 
 TEST(TraceForms, TypeOutsideTheListGivesTheEnteringForm) {
-  // The enumeration's underlying type is fixed, so that every int is a value of it.
+  // The enumeration's underlying type is fixed, so every int is a value of it.
   for (const int type : {4, -1, 512}) {
     EXPECT_STREQ("ENTERING: walk() in a.cpp [Line: 7]", trace("walk", "a.cpp", 7, static_cast<MessageType>(type)));
     EXPECT_STREQ("ENTERING: walk() in a.cpp [Line: 7],Parameters List:  x=1",
