@@ -1,4 +1,4 @@
-// The endpoint's extrinsic methods: accepted, checked and answered, and nothing changes.
+// The endpoint's extrinsic methods: they check their arguments and return a value, and change nothing.
 #include <ProviderCall.h>
 #include <World.h>
 #include <gmock/gmock.h>
@@ -13,13 +13,13 @@ using ::testing::ElementsAre;
 using ::testing::ElementsAreArray;
 using ::testing::IsEmpty;
 
-// A method, its argument and how it says that there is no such endpoint.
+// A method, its argument, and its error text if there is no such endpoint.
 struct Method {
   const char* name;
   const char* argumentName;
   Value argument;
   const char* function;    // of the factory
-  const char* parameters;  // that its entry line tells
+  const char* parameters;  // the parameters in its entry line
   std::vector<std::string> unknownEndpoint;
 };
 void PrintTo(const Method& method, std::ostream* out) { *out << method.name; }
@@ -63,7 +63,7 @@ class EndpointMethod : public EndpointMethods, public ::testing::WithParamInterf
   Outcome invoke(const Path& path, const std::vector<NamedValue>& arguments) {
     return provider.invokeMethod(path, GetParam().name, arguments);
   }
-  // Answered with that value, and closed in the way of methods: marked as left, and then done.
+  // The method returned that value, and ended as methods do: first the exit is logged, then the result is done.
   static void expectAnswer(const Outcome& outcome, std::uint32_t value, CMPIrc rc = CMPI_RC_OK) {
     EXPECT_EQ(rc, outcome.rc) << outcome;
     EXPECT_EQ(std::vector{uint32(value)}, outcome.result.data) << outcome;
@@ -292,7 +292,7 @@ TEST_F(EndpointMethods, ServerSearchOrderReadsTheServersAgain) {
 
 TEST_F(EndpointMethods, ServerSearchOrderFailsWhereTheServersCannotBeReadAgain) {
   haveOne();
-  // The tree fails in the last walk of all, that of the method itself.
+  // The tree fails in the last walk, that of the method itself.
   std::vector<zorva::agent::TreeCall> calls;
   const auto invoke = [this] {
     return provider.invokeMethod(kClass.key("Name", "eth0"), "SetDNSServerSearchOrder",

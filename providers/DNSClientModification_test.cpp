@@ -15,7 +15,7 @@ using ::testing::IsEmpty;
 using ::testing::Optional;
 
 constexpr const char* kClass = "ZORVA_DNSProtocolEndPoint";
-constexpr const char* kFailed = "modifyDNSSettingDataCMPIInstance Failed";  // the sibling's text
+constexpr const char* kFailed = "modifyDNSSettingDataCMPIInstance Failed";  // the text of the class for DNS settings
 constexpr const char* kFile = "HOSTNAME=filehost\nDOMAINNAME=file.example.org\n";
 
 const Instance kEmpty(kClass);
@@ -29,7 +29,7 @@ class DNSClientModification : public ::testing::Test {
   Outcome modify(const Instance& instance, const char* name = "eth0") {
     return provider_.modifyInstance(Path(kClass).key("Name", name), instance);
   }
-  // What the n-th node holds: suffixes joined by blanks, domain name and host name.
+  // The content of the n-th node: suffixes joined by blanks, domain name and host name.
   std::vector<std::string> node(std::size_t n) const {
     std::string suffixes;
     for (const std::string& suffix : world_.list(n, NodeLexicon::PROP_DNS_SUFFIXES).value_or(std::vector{"none"s})) {
@@ -38,7 +38,7 @@ class DNSClientModification : public ::testing::Test {
     return {suffixes, world_.text(n, NodeLexicon::PROP_DOMAIN_NAME).value_or("none"),
             world_.text(n, NodeLexicon::PROP_HOST_NAME).value_or("none")};
   }
-  // Takes back all that was set.
+  // Undoes all changes.
   void restore() {
     for (const auto& entry : std::filesystem::directory_iterator(world_.dataDir())) {
       std::filesystem::remove_all(entry.path());
@@ -63,10 +63,10 @@ void expectFailed(const Outcome& outcome) {
   expectDoneWithoutExit(outcome);
 }
 
-// --- what counts as present
+// --- which properties count as present
 
 TEST_F(DNSClientModification, TextsThatTheBrokerFailsToGiveLeaveWhatIsStored) {
-  for (const std::size_t call : {5U, 7U}) {  // that read the domain's name and the host's
+  for (const std::size_t call : {5U, 7U}) {  // the calls that read the domain name and the host name
     for (const Mode mode : {Mode::SetRc, Mode::RcAndNull}) {
       SCOPED_TRACE(std::to_string(call) + ' ' + nameOf(mode));
       restore();
@@ -179,7 +179,7 @@ TEST_F(DNSClientModification, AMissingKeyIsAnsweredWithTheBrokersCode) {
   EXPECT_EQ(asItWas_, node(0));
 }
 
-// --- what counts as present
+// --- which properties count as present
 
 TEST_F(DNSClientModification, WhatTheInstanceLacksStaysAsItWas) {
   const Outcome outcome = modify(kEmpty.with("Hostname", "newhost"));
@@ -334,7 +334,7 @@ TEST_F(DNSClientModification, WhateverTheBrokerFailsAtEachValueIsTheOldOrTheNewO
           const Outcome outcome = modify(kWhole);
           expectDoneWithoutExit(outcome);
         } catch (const InjectedFailure& failure) {
-          // What is thrown in the steps is caught; only the end of the result is left to throw.
+          // Exceptions in the steps are caught; only the end of the result can still throw.
           EXPECT_STREQ("the broker threw in returnDone", failure.what());
         }
         const auto held = node(0);

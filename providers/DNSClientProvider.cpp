@@ -14,8 +14,7 @@ static const char* const setDNSDomainMethod = "SetDNSDomain";
 static const char* const setDNSServerSearchOrderMethod = "SetDNSServerSearchOrder";
 static const char* const setDNSSuffixSearchOrderMethod = "SetDNSSuffixSearchOrder";
 
-// A failure below leaves the result open: neither done nor marked as left, with the status as the broker's calls left
-// it.
+// A failure leaves the result open: no returnDone and no exit in the log. The status is what the broker's calls left.
 
 static CMPIStatus DNSClient_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                               const CMPIObjectPath* ref) {
@@ -49,7 +48,7 @@ static CMPIStatus DNSClient_GetInstance(CMPIInstanceMI*, const CMPIContext* cont
   const CMPIString* name = stringOf(getKey(ref, "Name", &operation.status));
   DNSClientObjFactory factory;
   std::vector<CMPIInstance*> instances;
-  if (isGood(name)) {  // the name alone decides; the other keys are not looked at
+  if (isGood(name)) {  // only the name decides; the other keys are ignored
     if (factory.getOneDNSClientCMPIInstance(broker, ref, const_cast<CMPIString*>(name), properties, instances,
                                             &operation.status) != 0) {
       return fail(operation, "getOneDNSClientCMPIInstance Failed");
@@ -74,10 +73,10 @@ static CMPIStatus DNSClient_ModifyInstance(CMPIInstanceMI*, const CMPIContext* c
     operation.status.rc = static_cast<CMPIrc>(rc);
   }
   returnDone(result);
-  return {operation.status.rc, nullptr};  // no exit is marked
+  return {operation.status.rc, nullptr};  // no exit is logged
 }
 
-// True where the method of the endpoint class is meant; its argument is then in data.
+// True if the call is for the method of the endpoint class; its argument is then in data.
 static bool isCallOf(const char* ownMethod, const std::string& className, const char* method, const char* argument,
                      const CMPIArgs* in, CMPIData& data, CMPIStatus* status) {
   if (className != dnsProtocolEndPointClass || method == nullptr || std::strcmp(method, ownMethod) != 0) return false;
@@ -94,7 +93,7 @@ static void returnValue(const CMPIResult* result, unsigned int number) {
   if (result != nullptr) result->ft->returnData(result, &value, CMPI_uint32);
 }
 
-// A method of another name, or of another class, is answered with no value and no failure.
+// A method of another name or class returns no value and no failure.
 static CMPIStatus DNSClient_InvokeMethod(CMPIMethodMI*, const CMPIContext* context, const CMPIResult* result,
                                          const CMPIObjectPath* objectPath, const char* method, const CMPIArgs* in,
                                          CMPIArgs*) {
@@ -117,7 +116,7 @@ static CMPIStatus DNSClient_InvokeMethod(CMPIMethodMI*, const CMPIContext* conte
     returnValue(result, value);
   }
   markExit(operation);
-  returnDone(result);  // after the exit mark, the reverse of the instance operations
+  returnDone(result);  // after the exit line; instance operations do it before
   return status;
 }
 

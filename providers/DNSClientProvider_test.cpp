@@ -1,5 +1,4 @@
-// Reading the endpoints, as far as it is their own; what they share with the servers is tested in
-// ReadOperations_test.cpp.
+// Reading the endpoints: only what differs from the servers. ReadOperations_test.cpp tests what both share.
 #include <ProviderCall.h>
 #include <World.h>
 #include <gmock/gmock.h>

@@ -1,8 +1,8 @@
 // ZORVA_DNSEndPointElementSettingData: the DNS settings of each endpoint's own interface. Instance and association
-// provider, wholly from the factory.
+// provider, all objects come from the factory.
 //
 // An endpoint and a setting data belong together where the InstanceID, split at "%", has the endpoint's name as its
-// second part. An InstanceID of fewer parts is passed over in the enumerations; the association operations stop at it.
+// second part. The enumerations skip an InstanceID with fewer parts; the association operations stop at it.
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSSettingDataObjects.h"
 #include "providers/AssociationOperation.h"
@@ -18,14 +18,14 @@ static const char* const dnsEndpointElementSettingDataClass = "ZORVA_DNSEndPoint
 
 namespace {
 
-// Both references and the flags: 2, where the host-wide settings have 1.
+// Both references and the flags: 2 here, 1 for the host-wide settings.
 void setAll(const CMPIInstance* instance, const CMPIObjectPath* endpoint, const CMPIObjectPath* setting) {
   setPair(instance, "ManagedElement", endpoint, "SettingData", setting);
   setUint16(instance, "IsCurrent", 2);
   setUint16(instance, "IsDefault", 2);
 }
 
-// The interface that an InstanceID names; false where it names none.
+// The interface that an InstanceID names; false if it names none.
 bool interfaceOf(const std::string& instanceID, std::string& interfaceName) {
   std::vector<std::string> tokens;
   Tokenize(instanceID, tokens, "%");
@@ -34,7 +34,7 @@ bool interfaceOf(const std::string& instanceID, std::string& interfaceName) {
   return true;
 }
 
-// The same for an operation that cannot go on without it.
+// The same for an operation that cannot continue without it.
 bool requireInterfaceOf(const Operation& operation, const std::string& instanceID, std::string& interfaceName,
                         const Place& place = Place::here()) {
   return interfaceOf(instanceID, interfaceName) ||
@@ -59,7 +59,7 @@ static unsigned short DNSEndpointElementSettingDataCMPIInstances(const CMPIConte
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
   for (CMPIObjectPath* endpoint : counted16(endpoints)) {
     if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Server")) return 1;
-    setNameSpace(endpoint, nameSpace);  // its host stays as it came
+    setNameSpace(endpoint, nameSpace);  // its host is not changed
     const std::string name = keyText(endpoint, "Name", &operation.status);
     for (CMPIObjectPath* setting : counted16(settings)) {
       if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return 1;
@@ -83,7 +83,7 @@ static unsigned short DNSEndpointElementSettingDataCMPIInstances(const CMPIConte
   return 0;
 }
 
-// The paths of what is built: nothing goes out before all is built.
+// The paths of the built instances: none is returned before all are built.
 static CMPIStatus DNSEndpointElementSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                                   const CMPIResult* result, const CMPIObjectPath* ref) {
   Operation operation = ZV_OPERATION(loggerDNSEndpointElementSettingData, context, result, ref);
@@ -200,7 +200,7 @@ static bool referToSettings(Operation& operation, const ReferenceParts& parts) {
   return true;
 }
 
-// Their names: an instance is made for every candidate, matched or not.
+// The names of the references: an instance is made for every candidate, matching or not.
 static bool nameSettings(Operation& operation, const ReferenceParts& parts) {
   const std::string name = sourceKey(operation, "Name");
   std::vector<CMPIObjectPath*> settings;

@@ -23,9 +23,9 @@ class EndpointElementSettingData : public SettingAssociationTest {
   EndpointElementSettingData() : SettingAssociationTest(endpointElementSettingData()) {}
 
   void installOne() { world.host().nic("eth0").install(); }
-  // Endpoints come in the order of their names, settings in that of the interfaces.
+  // Endpoints come in the order of their names, settings in the order of the interfaces.
   void installThree() { world.host().nic("eth1").nic("eth0").bmc().nic("bmc0").install(); }
-  // The second setting has no key, the third is of the endpoint's name again.
+  // The second setting has no key, the third has the endpoint's name again.
   void installMalformed() { world.host().nic("eth0").nic("x", {.isUnnamed = true}).bmc().nic("eth0").install(); }
 
   static std::string token(const std::string& name) { return "log 4000 VARIABLE instance_tokens[1] = " + name; }
@@ -43,7 +43,7 @@ TEST_F(EndpointElementSettingData, InstancesAreBuiltFirstAndHandedOutThen) {
                   entry(kBuilder),
                   newEndpointPath("OP1", "eth0"),
                   newSettingPath("OP2", "Computer%eth0"),
-                  {inRootCimv2("OP1"), token("eth0")},  // the endpoint is not told the host again
+                  {inRootCimv2("OP1"), token("eth0")},  // the endpoint's host is not set again
                   placed("OP2"),
                   newHostPath("OP3", kAssociation),
                   {"newInstance(OP3)", R"(I1.setPropertyFilter(null, {"ManagedElement", "SettingData"}))"},
@@ -126,7 +126,7 @@ TEST_F(EndpointElementSettingData, MalformedSettingIsPassedOverInSilence) {
     const Outcome outcome = run();
     EXPECT_THAT(pairsOf(outcome), ElementsAre("eth0 > Computer%eth0", "eth0 > BMC%eth0"));
     EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "done, marked"));
-    // Of both endpoints, the nameless and eth0: nothing is told of the two settings without a second part.
+    // Of both endpoints, the nameless one and eth0: the log has no line about the two settings without a second part.
     EXPECT_THAT(outcome.lines.ofCategory(under.category).ofKind(LineKind::Variable), SizeIs(4));
   }
 }
@@ -423,7 +423,7 @@ TEST_F(EndpointElementSettingData, FailedFetchOfSettingPathsIsToldAndLeftOpen) {
   }
 }
 
-// --- What a client asks to see
+// --- the properties that a client requests
 
 TEST_F(EndpointElementSettingData, PropertyListNarrowsAssociatorsAndNoReferences) {
   world.host().nic("eth0", usualNic()).install();

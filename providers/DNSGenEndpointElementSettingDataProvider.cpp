@@ -1,5 +1,5 @@
 // ZORVA_DNSGenEndPointElementSettingData: the host-wide DNS settings of every endpoint. Instance and association
-// provider, wholly from the factory. Every endpoint goes with the settings: no key of either end is read.
+// provider, all objects come from the factory. Every endpoint has the settings: no key of either end is read.
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSGeneralSettingDataObjects.h"
 #include "providers/AssociationOperation.h"
@@ -14,7 +14,7 @@ static const char* const dnsGeneralSettingDataClass = "ZORVA_DNSGeneralSettingDa
 static const char* const dnsEndpointElementSettingDataClass = "ZORVA_DNSEndPointElementSettingData";
 static const char* const dnsGenEndpointElementSettingDataClass = "ZORVA_DNSGenEndPointElementSettingData";
 
-// Both references and the flags: 1, where the settings of single endpoints have 2.
+// Both references and the flags: 1 here, 2 for the settings of single endpoints.
 static void setAll(const CMPIInstance* instance, const CMPIObjectPath* endpoint, const CMPIObjectPath* setting) {
   setPair(instance, "ManagedElement", endpoint, "SettingData", setting);
   setUint16(instance, "IsCurrent", 1);
@@ -37,7 +37,7 @@ static unsigned short DNSGenEndpointElementSettingDataCMPIInstances(const CMPICo
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
   for (CMPIObjectPath* endpoint : counted16(endpoints)) {
     if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Server")) return 1;
-    setNameSpace(endpoint, nameSpace);  // its host stays as it came
+    setNameSpace(endpoint, nameSpace);  // its host is not changed
     for (CMPIObjectPath* setting : counted16(settings)) {
       if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return 1;
       setNameSpaceAndHost(setting, nameSpace);
@@ -57,7 +57,7 @@ static unsigned short DNSGenEndpointElementSettingDataCMPIInstances(const CMPICo
   return 0;
 }
 
-// Delivers each path at once: a failure further on leaves what went out, and the result open.
+// Returns each path at once: after a later failure these paths are already delivered, and the result stays open.
 static CMPIStatus DNSGenEndpointElementSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                                      const CMPIResult* result,
                                                                      const CMPIObjectPath* ref) {
@@ -78,7 +78,7 @@ static CMPIStatus DNSGenEndpointElementSettingData_EnumInstanceNames(CMPIInstanc
     setNameSpace(endpoint, nameSpace);
     for (CMPIObjectPath* setting : counted16(settings)) {
       if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNSGeneralSettingData")) return operation.status;
-      setNameSpace(setting, nameSpace);  // no host, unlike in the builder
+      setNameSpace(setting, nameSpace);  // the host is set only in the builder
       CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsGenEndpointElementSettingDataClass, &operation.status);
       if (isMissing(operation, path,
                     "Create CMPIObjectPath failed for                     DNSGenEndpointElementSettingData Class.")) {
@@ -201,7 +201,7 @@ static CMPIStatus DNSGenEndpointElementSettingData_References(CMPIAssociationMI*
                dnsGenEndpointElementSettingDataClass, deliverInstance);
 }
 
-// The paths are of the sister association's class, the one of single endpoints' settings.
+// The paths have the class of the sibling association, the one for the settings of single endpoints.
 static CMPIStatus DNSGenEndpointElementSettingData_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
                                                                   const CMPIResult* result, const CMPIObjectPath* ref,
                                                                   const char*, const char*) {

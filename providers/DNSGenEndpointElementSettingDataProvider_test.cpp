@@ -55,7 +55,7 @@ TEST_F(GenEndpointElementSettingData, NamesAreMadeOfBothPathsAndGoOutAtOnce) {
   EXPECT_EQ(tell({entry(operation("EnumInstanceNames")),
                   newEndpointPath("OP1", "eth0"),
                   newGeneralSettingPath("OP2"),
-                  {inRootCimv2("OP1"), inRootCimv2("OP2")},  // the setting is not told the host again
+                  {inRootCimv2("OP1"), inRootCimv2("OP2")},  // the setting's host is not set again
                   newHostPath("OP3", kAssociation),
                   keyEnds("OP3", "OP1", "OP2"),
                   {"returnObjectPath(OP3)"},
@@ -71,7 +71,7 @@ TEST_F(GenEndpointElementSettingData, InstancesAreBuiltFirstAndHandedOutThen) {
                   entry(kBuilder),
                   newEndpointPath("OP1", "eth0"),
                   newGeneralSettingPath("OP2"),
-                  {inRootCimv2("OP1")},  // the endpoint is not told the host again
+                  {inRootCimv2("OP1")},  // the endpoint's host is not set again
                   placed("OP2"),
                   newHostPath("OP3", kAssociation),
                   {"newInstance(OP3)", R"(I1.setPropertyFilter(null, {"ManagedElement", "SettingData"}))"},

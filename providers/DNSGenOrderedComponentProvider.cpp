@@ -1,6 +1,6 @@
 // ZORVA_DNSGenOrderedComponent: the host-wide DNS settings as a component of each IP assignment setting. Instance and
-// association provider; the IP assignment settings are served elsewhere and asked for through the broker. No key
-// decides what belongs together.
+// association provider; the IP assignment settings are served by another provider and read through the broker. No key
+// is compared: every pair belongs together.
 #include <stdexcept>
 
 #include "factory/DNSClientObjFactory.h"
@@ -16,20 +16,20 @@ static const char* const dnsGeneralSettingDataClass = "ZORVA_DNSGeneralSettingDa
 static const char* const dnsGenOrderedComponentClass = "ZORVA_DNSGenOrderedComponent";
 static const char* const ipAssignmentSettingDataClass = "ZORVA_IPAssignmentSettingData";
 
-// Both references and the place: the interface's own settings come second.
+// Both references and the position: the interface's own settings come second.
 static void setAll(const CMPIInstance* instance, const CMPIObjectPath* group, const CMPIObjectPath* part) {
   setPair(instance, "GroupComponent", group, "PartComponent", part);
   setUint64(instance, "AssignedSequence", 1);
 }
 
-// Throws out of range where there are none; the provider lets that pass, and a server reports a failed operation with
-// this text.
+// Throws std::out_of_range if there are none. The provider does not catch it, and a server reports a failed operation
+// with this text.
 static CMPIObjectPath* firstOf(const std::vector<CMPIObjectPath*>& settings) {
   if (settings.empty()) throw std::out_of_range("vector::_M_range_check");
   return settings.front();
 }
 
-// Without host-wide settings, and with an IP assignment to pair them with, std::out_of_range leaves this function.
+// If there is an IP assignment but no host-wide settings, std::out_of_range leaves this function.
 static unsigned short DNSGeneralOrderedComponentCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
                                                               const char** properties,
                                                               std::vector<CMPIInstance*>& instances) {
@@ -48,7 +48,7 @@ static unsigned short DNSGeneralOrderedComponentCMPIInstances(const CMPIContext*
   }
   while (hasNext(assignments, &operation.status)) {
     const CMPIObjectPath* assignment = nextPath(assignments, &operation.status);
-    keyText(assignment, "InstanceID", &operation.status);  // read, as the other below, and compared with nothing
+    keyText(assignment, "InstanceID", &operation.status);  // read, like the other key below, but not compared
     CMPIObjectPath* setting = firstOf(settings);
     if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return 1;
     keyText(setting, "InstanceID", &operation.status);
@@ -67,7 +67,7 @@ static unsigned short DNSGeneralOrderedComponentCMPIInstances(const CMPIContext*
   return 0;
 }
 
-// The paths of what is built: nothing goes out before all is built.
+// The paths of the built instances: none is returned before all are built.
 static CMPIStatus DNSGeneralOrderedComponent_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                                const CMPIResult* result, const CMPIObjectPath* ref) {
   Operation operation = ZV_OPERATION(loggerDNSGeneralOrderedComponent, context, result, ref);
@@ -91,7 +91,7 @@ static CMPIStatus DNSGeneralOrderedComponent_GetInstance(CMPIInstanceMI*, const 
   return end(operation);
 }
 
-// No key of the source is read in the four operations below: every object of the far end counts.
+// The four operations below read no key of the source: every object of the far end counts.
 
 static CMPIStatus DNSGeneralOrderedComponent_Associators(CMPIAssociationMI*, const CMPIContext* context,
                                                          const CMPIResult* result, const CMPIObjectPath* ref,
@@ -169,7 +169,7 @@ static CMPIStatus refer(Operation operation, Deliver deliver) {
     if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, farEnd.path, &settings, &operation.status) != 0) {
       return fail(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
     }
-    for (CMPIObjectPath* setting : counted16(settings)) {  // every one, not only the first as in the builder
+    for (CMPIObjectPath* setting : counted16(settings)) {  // every one; the builder uses only the first
       const CMPIInstance* reference = newInstance(broker, association, &operation.status);
       setNameSpaceAndHost(setting, nameSpace);
       setAll(reference, operation.ref, setting);
@@ -181,7 +181,8 @@ static CMPIStatus refer(Operation operation, Deliver deliver) {
     while (hasNext(assignments, &operation.status)) {
       nextPath(assignments, &operation.status);  // only counted: each part is the far end's class without keys
       const CMPIInstance* reference = newInstance(broker, association, &operation.status);
-      setAll(reference, operation.ref, farEnd.path);  // the source is the group, the reverse of the builder
+      setAll(reference, operation.ref,
+             farEnd.path);  // the source is the group; the builder has them the other way round
       deliver(operation, reference, nameSpace);
     }
   }

@@ -31,7 +31,7 @@ class GeneralOrderedComponent : public SettingAssociationTest {
   Story setAll(const std::string& instance, const std::string& group, const std::string& part) const {
     return tell({setEnds(instance, group, part), sequence(instance, 1)});
   }
-  // Of the lines with parameters the labels have two equal signs.
+  // In lines with parameters the labels have two equal signs.
   static std::string builderLine(const char* form) {
     return std::string("log 3000 ") + form + " " + kBuilder + ", ref==ADDR properties==0 ctx==ADDR instances==ADDR";
   }

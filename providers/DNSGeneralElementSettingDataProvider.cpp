@@ -1,8 +1,8 @@
 // ZORVA_DNSGeneralElementSettingData: the host-wide DNS settings of the computer system. Instance and association
-// provider; the computer systems are served elsewhere and asked for through the broker.
+// provider; the computer systems are served by another provider and read through the broker.
 //
-// The enumerations pair a system with settings whose InstanceID holds its Name. The association operations apply no key
-// at all.
+// The enumerations pair a system with settings whose InstanceID contains its Name. The association operations compare
+// no key.
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSGeneralSettingDataObjects.h"
 #include "providers/AssociationOperation.h"
@@ -16,7 +16,7 @@ static const char* const computerSystemClass = "ZORVA_ComputerSystem";
 static const char* const dnsGeneralSettingDataClass = "ZORVA_DNSGeneralSettingData";
 static const char* const dnsGeneralElementSettingDataClass = "ZORVA_DNSGeneralElementSettingData";
 
-// Both references and the flags: 1, where the settings of single endpoints have 2.
+// Both references and the flags: 1 here, 2 for the settings of single endpoints.
 static void setAll(const CMPIInstance* instance, const CMPIObjectPath* system, const CMPIObjectPath* setting) {
   setPair(instance, "ManagedElement", system, "SettingData", setting);
   setUint16(instance, "IsCurrent", 1);
@@ -63,7 +63,7 @@ static unsigned short DNSGeneralElementSettingDataCMPIInstances(const CMPIContex
   return 0;
 }
 
-// Delivers each path at once: a failure further on leaves what went out, and the result open.
+// Returns each path at once: after a later failure these paths are already delivered, and the result stays open.
 static CMPIStatus DNSGeneralElementSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                                  const CMPIResult* result, const CMPIObjectPath* ref) {
   Operation operation = ZV_OPERATION(loggerDNSGeneralElementSettingData, context, result, ref);
@@ -85,9 +85,9 @@ static CMPIStatus DNSGeneralElementSettingData_EnumInstanceNames(CMPIInstanceMI*
         complain(operation, "Key is not matched");
         continue;
       }
-      // Only after its key was read.
+      // Checked only after its key was read.
       if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNSGeneralSettingData")) return operation.status;
-      setNameSpace(setting, nameSpace);  // no host, unlike in the builder
+      setNameSpace(setting, nameSpace);  // the host is set only in the builder
       CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsGeneralElementSettingDataClass, &operation.status);
       if (isMissing(operation, path,
                     "Create CMPIObjectPath failed for                         DNSGeneralElementSettingData Class")) {
@@ -115,7 +115,7 @@ static CMPIStatus DNSGeneralElementSettingData_GetInstance(CMPIInstanceMI*, cons
   return end(operation);
 }
 
-// No key of the source is read in the four operations below: every object of the far end counts.
+// The four operations below read no key of the source: every object of the far end counts.
 
 static CMPIStatus DNSGeneralElementSettingData_Associators(CMPIAssociationMI*, const CMPIContext* context,
                                                            const CMPIResult* result, const CMPIObjectPath* ref,

@@ -51,7 +51,7 @@ class GeneralElementSettingData : public AssociationTest {
     for (const std::string& name : names) all.push_back(objectOf(systemPath(name)));
     return all;
   }
-  // A host with the one general setting data that an interface gives it.
+  // A host with one general setting data.
   void install(const std::vector<std::string>& systemNames) {
     world.nic("eth0").install();
     broker.serve(kSystem, systems(systemNames));
@@ -68,7 +68,7 @@ class GeneralElementSettingData : public AssociationTest {
   }
 };
 
-// --- Which systems belong to the settings
+// --- Which systems have the settings
 
 TEST_F(GeneralElementSettingData, SystemsWhoseNameStandsInTheInstanceIDArePairedByTheEnumerations) {
   install({});
@@ -191,7 +191,7 @@ TEST_F(GeneralElementSettingData, NamesLeaveOpenOnEveryFailureAndShowItsCode) {
 }
 
 TEST_F(GeneralElementSettingData, NamesTestTheSettingsPathOnlyAfterItsKeyWasRead) {
-  install({"host1", "host1", ""});  // without a handle the key reads as the empty text, in which only "" stands
+  install({"host1", "host1", ""});  // without a handle the key reads as the empty text, which contains only ""
   const Outcome lost = losingHandles(kSetting, kAssociation, names());
   EXPECT_THAT(lost.paths(), SizeIs(1));
   EXPECT_THAT(endOf(lost), ElementsAre("CMPI_RC_OK", "not done, not marked", kNotMatched, kBadSettingInNames));
@@ -435,7 +435,7 @@ TEST_F(GeneralElementSettingData, AssociationClassOfAnotherAssociationLeadsToIts
   EXPECT_THAT(endOf(associators(systemPath("host1"), endpoints)), ElementsAre("CMPI_RC_OK", "done, marked"));
   EXPECT_THAT(endOf(associatorNames(systemPath("host1"), endpoints)), ElementsAre("CMPI_RC_OK", "done, marked"));
   EXPECT_THAT(associators(systemPath("host1"), endpoints).instances(), IsEmpty());
-  // Ends that both have.
+  // Both associations have these ends.
   EXPECT_THAT(textsOf(associators(endpointPath("eth0"), endpoints).instances(), "Name"), ElementsAre("host1"));
   const AssociationQuery settings = {.assocClass = "ZORVA_DNSGenEndPointElementSettingData"};
   EXPECT_THAT(textsOf(associatorNames(endpointPath("eth0"), settings).paths(), "InstanceID"),

@@ -19,7 +19,7 @@ constexpr const char* kClass = "ZORVA_DNSGeneralSettingData";
 constexpr const char* kFile = "DOMAINNAME=d\nDNSSUFFIXES=old \nCONFIG_NAME=office\n";
 constexpr const char* kMissing =
     "In modifyDNSGeneralSettingDataCMPIInstance function PROPERTY_CONFIGURATION_NAME does not found";
-constexpr const char* kFailed = "modifyDNSSettingDataCMPIInstance Failed";  // the sibling's text
+constexpr const char* kFailed = "modifyDNSSettingDataCMPIInstance Failed";  // the text of the class for DNS settings
 
 const Instance kEmpty(kClass);
 const Instance kWhole =
@@ -41,7 +41,7 @@ class DNSGeneralSettingDataModification : public ::testing::Test {
   InstanceProvider provider_{DNSGeneralSettingDataProvider_Create_InstanceMI, broker_};
 };
 
-// A failure of the modification, with what the broker left in the status: nothing is returned, not even done.
+// A failed modification, with the status as the broker left it: nothing is returned, and returnDone is not called.
 void expectLeftOpen(const Outcome& outcome) {
   EXPECT_TRUE(outcome.markedEntry());
   EXPECT_EQ(0U, outcome.calls.count("returnDone"));
@@ -97,7 +97,7 @@ TEST_F(DNSGeneralSettingDataModification, ThePropertyListDecidesNothing) {
   EXPECT_EQ("DOMAINNAME=d\nDNSSUFFIXES=a.example.org b \nCONFIG_NAME=home\n", content());
 }
 
-// --- what counts as present
+// --- which properties count as present
 
 TEST_F(DNSGeneralSettingDataModification, SuffixesAloneAreWrittenAndTheMissingNameIsLogged) {
   broker_.missingProperty = {CMPI_RC_OK, CMPI_nullValue};
@@ -151,7 +151,7 @@ TEST_F(DNSGeneralSettingDataModification, AFailureGivesTheMessageThatTheBrokerLe
 }
 
 TEST_F(DNSGeneralSettingDataModification, ASuccessGivesTheBrokersCodeWithoutItsMessage) {
-  broker_.failEach("getProperty", Mode::SetRc);  // the list is given all the same
+  broker_.failEach("getProperty", Mode::SetRc);  // the list is returned even so
   const Outcome outcome = modify(kEmpty.with("DNSSuffixesToAppend", texts({"a"})));
   EXPECT_EQ(CMPI_RC_ERR_FAILED, outcome.rc);
   EXPECT_EQ(std::nullopt, outcome.message);

@@ -8,8 +8,7 @@ namespace ZV {
 
 static const std::string loggerDNSGeneralSettingDataProv = "Zorvagent.DNSGeneralSettingDataProvider";
 
-// A failure below leaves the result open: neither done nor marked as left, with the status as the broker's calls left
-// it.
+// A failure leaves the result open: no returnDone and no exit in the log. The status is what the broker's calls left.
 
 static CMPIStatus DNSGeneralSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                           const CMPIResult* result, const CMPIObjectPath* ref) {
@@ -46,8 +45,8 @@ static CMPIStatus DNSGeneralSettingData_GetInstance(CMPIInstanceMI*, const CMPIC
   return end(operation);
 }
 
-// Unlike its siblings this modification keeps its own rc to itself: the client gets what the broker's calls left in the
-// status, and a failure leaves the result open.
+// This modification does not return its own rc: the client gets the status that the broker's calls left, and a failure
+// leaves the result open.
 static CMPIStatus DNSGeneralSettingData_ModifyInstance(CMPIInstanceMI*, const CMPIContext* context,
                                                        const CMPIResult* result, const CMPIObjectPath* ref,
                                                        const CMPIInstance* instance, const char** properties) {
@@ -57,7 +56,7 @@ static CMPIStatus DNSGeneralSettingData_ModifyInstance(CMPIInstanceMI*, const CM
     return fail(operation, "modifyDNSSettingDataCMPIInstance Failed");
   }
   returnDone(result);
-  return {operation.status.rc, nullptr};  // no exit is marked
+  return {operation.status.rc, nullptr};  // no exit is logged
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSGeneralSettingData)

@@ -24,7 +24,7 @@ class DNSGeneralSettingDataProviderTest : public ::testing::Test {
  protected:
   DNSGeneralSettingDataProviderTest() { world_.host("myhost"); }
 
-  // The operations that read, each with a request of its own.
+  // The reading operations, each with its own request.
   std::vector<Outcome> readAll() {
     return {provider_.enumerateInstances(kClass), provider_.enumerateInstanceNames(kClass),
             provider_.getInstance(id("dnsgen1:myhost"))};
@@ -116,7 +116,7 @@ TEST_F(DNSGeneralSettingDataProviderTest, LinesSayWhichSourceAndFunctionTheyAreF
   EXPECT_EQ("settings/DNSGeneralSettingData.cpp", lines.at(3).file);
 }
 
-// --- what comes out
+// --- values
 
 TEST_F(DNSGeneralSettingDataProviderTest, TheInstanceIDOfAnotherSystemGivesTheInstanceOfThisOne) {
   world_.nic("eth0", usualNic()).install();

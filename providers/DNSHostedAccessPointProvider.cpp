@@ -1,9 +1,9 @@
 // ZORVA_DNSHostedAccessPoint: the computer system that hosts each DNS endpoint. Instance and association provider; the
-// computer systems are served elsewhere and asked for through the broker.
+// computer systems are served by another provider and read through the broker.
 //
-// A system's Name is compared with an endpoint's SystemName. The builder takes a part of the Name for a match too; the
-// names, the associators and the references need the whole Name. The associators of a system also leave out the
-// endpoints of the service processor.
+// A system's Name is compared with an endpoint's SystemName. For the builder a part of the Name matches too; the names,
+// the associators and the references need the whole Name. The associators of a system also leave out the endpoints of
+// the service processor.
 #include <strings.h>
 
 #include "factory/DNSClientObjFactory.h"
@@ -56,7 +56,7 @@ static unsigned short DNSHostedAccessPointCMPIInstances(const CMPIContext* conte
   return 0;
 }
 
-// Delivers each path at once: a failure further on leaves what went out, and the result open.
+// Returns each path at once: after a later failure these paths are already delivered, and the result stays open.
 static CMPIStatus DNSHostedAccessPoint_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                          const CMPIResult* result, const CMPIObjectPath* ref) {
   Operation operation = ZV_OPERATION(loggerDNSHostAccessPoint, context, result, ref);
@@ -76,7 +76,7 @@ static CMPIStatus DNSHostedAccessPoint_EnumInstanceNames(CMPIInstanceMI*, const 
     }
     for (CMPIObjectPath* endpoint : counted16(endpoints)) {
       if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Client")) return operation.status;
-      if (name != keyText(endpoint, "SystemName", &operation.status)) continue;  // stricter than the builder
+      if (name != keyText(endpoint, "SystemName", &operation.status)) continue;  // the builder also accepts a part
       setNameSpace(endpoint, nameSpace);
       CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsHostedAccessPointClass, &operation.status);
       if (isMissing(operation, path,

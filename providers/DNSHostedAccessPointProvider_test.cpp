@@ -21,7 +21,7 @@ const char* const kNoSystemClass = "Create CMPIObjectPath failed for ComputerSys
 const char* const kNoNames = "CBEnumInstanceNames Failed for the target Class";
 const char* const kNoEndpointsInBuilder =
     "***Can't get DNS Client ObjectPaths.                 Exiting EnumerateInstanceNames***";
-const char* const kNoEndpointsInNames =  // one blank more
+const char* const kNoEndpointsInNames =  // with one more blank
     "***Can't get DNS Client ObjectPaths.                  Exiting EnumerateInstanceNames***";
 const char* const kBadEndpoint = "CMPIObjectPath is NULL for DNS Client";
 const char* const kNoPath = "Create CMPIObjectPath failed for                     dnsHostedAccessPointClass.";
@@ -66,7 +66,7 @@ class HostedAccessPoint : public AssociationTest {
   }
 };
 
-// --- Which systems and endpoints belong together
+// --- Which systems host which endpoints
 
 TEST_F(HostedAccessPoint, SystemOfTheHostsNameIsPairedWithAllEndpointsInEveryOperation) {
   install({"eth1", "eth0"}, {"host1"});
@@ -117,7 +117,7 @@ TEST_F(HostedAccessPoint, SystemOfAnotherNameIsPairedWithNothing) {
 
 TEST_F(HostedAccessPoint, EndpointWithAnEmptySystemNameIsPairedWithEverySystemByTheBuilder) {
   install({"eth0"}, {"anything"});
-  const char* const systemName = R"(addKey("SystemName")";  // refused by the broker, it stays empty
+  const char* const systemName = R"(addKey("SystemName")";  // the broker refuses it, so it stays empty
   EXPECT_THAT(pairsOf(failing(systemName, Mode::SetRc, instances())), ElementsAre("anything > eth0"));
   EXPECT_THAT(pairsOf(failing(systemName, Mode::SetRc, names())), IsEmpty());
   broker.serve(kSystem, systems({""}));
@@ -469,7 +469,7 @@ TEST_F(HostedAccessPoint, AssociationClassOfAnotherAssociationLeadsToItsFarEnd) 
   const AssociationQuery servers = {.assocClass = "ZORVA_RemoteAccessAvailableToElement"};
   EXPECT_THAT(endOf(associators(endpointPath("eth0"), servers)), ElementsAre("CMPI_RC_OK", "not done, marked"));
   EXPECT_THAT(endOf(associatorNames(endpointPath("eth0"), servers)), ElementsAre("CMPI_RC_OK", "not done, marked"));
-  // An end that both have: the endpoints whose system has the source's name.
+  // Both associations have this end: the endpoints whose system has the source's name.
   EXPECT_THAT(associators(serverPath("192.0.2.1"), servers).instances(), IsEmpty());
   EXPECT_THAT(textsOf(associators(serverPath("host1"), servers).instances(), "Name"), ElementsAre("eth0"));
   EXPECT_THAT(associationProvider.associators(endpointPath("eth0"), {}).instances(), SizeIs(1));

@@ -1,8 +1,9 @@
 // ZORVA_DNSOrderedComponent: an interface's DNS settings as a component of its IP assignment settings. Instance and
-// association provider; the IP assignment settings are served elsewhere and asked for through the broker.
+// association provider; the IP assignment settings are served by another provider and read through the broker.
 //
-// An IP assignment's InstanceID is the DNS setting's, a "%" and a part of its own: up to its last "%" it must equal the
-// DNS setting's. Without a "%" the builder takes it whole; the association operations stop at it.
+// An IP assignment's InstanceID is the DNS setting's, a "%" and one more part: the text before its last "%" must equal
+// the DNS setting's InstanceID. If it has no "%", the builder uses the whole text; the association operations stop at
+// it.
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSSettingDataObjects.h"
 #include "providers/AssociationOperation.h"
@@ -18,7 +19,7 @@ static const char* const ipAssignmentSettingDataClass = "ZORVA_IPAssignmentSetti
 
 namespace {
 
-// Both references and the place: the host-wide settings come first.
+// Both references and the position: the host-wide settings come first.
 void setAll(const CMPIInstance* instance, const CMPIObjectPath* group, const CMPIObjectPath* part) {
   setPair(instance, "GroupComponent", group, "PartComponent", part);
   setUint64(instance, "AssignedSequence", 2);
@@ -28,7 +29,7 @@ std::string pathKey(Operation& operation, const CMPIInstance* instance) {
   return keyText(objectPathOf(instance, &operation.status), "InstanceID", &operation.status);
 }
 
-// The DNS setting's InstanceID in that of an IP assignment; false where the operation cannot go on without a "%".
+// The DNS setting's InstanceID within that of an IP assignment; false if the operation cannot continue without a "%".
 bool requireTarget(const Operation& operation, const std::string& instanceID, std::string& target,
                    const Place& place = Place::here()) {
   const std::size_t cut = instanceID.rfind('%');
@@ -78,7 +79,7 @@ static unsigned short DNSOrderedComponentCMPIInstances(const CMPIContext* contex
   return 0;
 }
 
-// The paths of what is built: nothing goes out before all is built.
+// The paths of the built instances: none is returned before all are built.
 static CMPIStatus DNSOrderedComponent_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                         const CMPIResult* result, const CMPIObjectPath* ref) {
   Operation operation = ZV_OPERATION(loggerDNSOrderedComponent, context, result, ref);
@@ -134,7 +135,7 @@ static CMPIStatus DNSOrderedComponent_Associators(CMPIAssociationMI*, const CMPI
     }
     for (const CMPIInstance* setting : counted16(settings)) {
       const std::string instanceID = pathKey(operation, setting);
-      if (!requireTarget(operation, sourceID, target)) return operation.status;  // only once there is a candidate
+      if (!requireTarget(operation, sourceID, target)) return operation.status;  // only if there is a candidate
       if (target == instanceID) returnInstance(result, setting);
     }
   }
@@ -202,7 +203,8 @@ static CMPIStatus refer(Operation operation, PartOf partOf, Deliver deliver) {
       return fail(operation, "getAllDNSSettingDataCMPIObjectPaths Failed");
     }
     for (CMPIObjectPath* setting : counted16(settings)) {
-      const CMPIInstance* reference = newInstance(broker, association, &operation.status);  // matched or not
+      const CMPIInstance* reference =
+          newInstance(broker, association, &operation.status);  // made whether it matches or not
       const std::string instanceID = keyText(setting, "InstanceID", &operation.status);
       if (!requireTarget(operation, sourceID, target)) return operation.status;
       if (target != instanceID) continue;

@@ -24,7 +24,7 @@ class OrderedComponent : public SettingAssociationTest {
     world.host().nic("eth0").install();
     serveAssignments({"Computer%eth0%ipv4"});
   }
-  // Two assignments of eth0, one of eth1; the first setting is that of eth1.
+  // Two assignments of eth0, one of eth1; the first setting belongs to eth1.
   void installTwo() {
     world.host().nic("eth1").nic("eth0").install();
     serveAssignments({"Computer%eth0%ipv4", "Computer%eth1%ipv4", "Computer%eth0%ipv6"});
@@ -102,12 +102,12 @@ TEST_F(OrderedComponent, HostWithoutSettingsHasNoAssociation) {
   }
 }
 
-// --- Which assignment belongs to which setting
+// --- Which assignment has which setting
 
 struct Cut {
   const char* assignment;
   const char* target;
-  const char* setting;  // that it belongs to; null for none
+  const char* setting;  // its setting; null for none
 };
 
 // The settings of a host with interfaces eth0, "eth0%" and one without a name, whose InstanceID is absent.
@@ -144,7 +144,7 @@ TEST_F(OrderedComponent, TextBeforeTheLastPercentSignIsCompared) {
       EXPECT_EQ(pairs.size(), handedOut(outcome));
       EXPECT_EQ("done, marked", endOf(outcome).at(1));
     }
-    if (cut.setting == nullptr || *cut.setting == '\0') continue;  // a path without keys is told by its class
+    if (cut.setting == nullptr || *cut.setting == '\0') continue;  // a path without keys is recognized by its class
     EXPECT_EQ(pairs, pairsOf(all));
     EXPECT_EQ(pairs, pairsOf(references(source)));
     EXPECT_EQ(pairs, pairsOf(referenceNames(source)));

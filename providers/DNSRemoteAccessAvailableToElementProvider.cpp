@@ -1,5 +1,5 @@
-// ZORVA_RemoteAccessAvailableToElement: every DNS server is within reach of every endpoint. Instance and association
-// provider, wholly from the factory.
+// ZORVA_RemoteAccessAvailableToElement: every DNS server is available to every endpoint. Instance and association
+// provider; all objects come from the factory.
 #include "factory/DNSClientObjFactory.h"
 #include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"
@@ -26,7 +26,7 @@ static unsigned short RemoteAccessAvailableToElementCMPIInstances(const CMPICont
   const std::string nameSpace = nameSpaceOf(ref, &operation.status);
   for (CMPIObjectPath* server : counted16(servers)) {
     if (isMissing(operation, server, "CMPIObjectPath is NULL for DNS Server")) return 1;
-    std::vector<CMPIObjectPath*> clients;  // made afresh for every server
+    std::vector<CMPIObjectPath*> clients;  // made again for every server
     if (!fetchEndpoints(operation, factory, ref, clients)) {
       return failBuilder(operation,
                          "***Can't get ObjectPaths for DNSClient.                 Exiting EnumerateInstanceNames***");
@@ -47,14 +47,14 @@ static unsigned short RemoteAccessAvailableToElementCMPIInstances(const CMPICont
   return 0;
 }
 
-// The enumerations alone are done after they are marked as left.
+// Only the enumerations call returnDone after the exit is logged.
 static CMPIStatus endEnumeration(const Operation& operation, const Place& place = Place::here()) {
   markExit(operation, place);
   returnDone(operation.result);
   return operation.status;
 }
 
-// Delivers each path at once: a failure further on leaves what went out, and the result open.
+// Returns each path at once: after a later failure these paths are already delivered, and the result stays open.
 static CMPIStatus DNSRemoteAccessAvailableToElement_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                                       const CMPIResult* result,
                                                                       const CMPIObjectPath* ref) {
@@ -104,7 +104,7 @@ static CMPIStatus DNSRemoteAccessAvailableToElement_GetInstance(CMPIInstanceMI*,
 
 // The four operations below never call returnDone.
 
-// Of the far end's objects those on the source's system go out.
+// Returns the objects of the far end that are on the source's system.
 static CMPIStatus DNSRemoteAccessAvailableToElement_Associators(CMPIAssociationMI*, const CMPIContext* context,
                                                                 const CMPIResult* result, const CMPIObjectPath* ref,
                                                                 const char* assocClass, const char* resultClass,
@@ -171,8 +171,8 @@ static void setEnds(const CMPIInstance* reference, const FarEnd& farEnd, const C
   setPair(reference, "Antecedent", farEndIsServer ? target : source, "Dependent", farEndIsServer ? source : target);
 }
 
-// The references and their names are two walks, since the first makes instances of keys alone and takes their paths.
-// Neither filters: the source need not exist. OrderOfAccess is for the enumerations alone.
+// References and ReferenceNames have separate walks, because the first makes instances with keys only and takes their
+// paths. Neither filters: the source need not exist. Only the enumerations set OrderOfAccess.
 
 static CMPIStatus DNSRemoteAccessAvailableToElement_References(CMPIAssociationMI*, const CMPIContext* context,
                                                                const CMPIResult* result, const CMPIObjectPath* ref,

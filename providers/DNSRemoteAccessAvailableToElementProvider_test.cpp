@@ -41,7 +41,7 @@ class RemoteAccessAvailableToElement : public AssociationTest {
                          .associationsAreDone = false}) {}
 
   void installOneOfEach() { world.nic("eth0", {.servers = {"192.0.2.1"}}).install(); }
-  // Addresses sort as text: 192.0.2.1, 192.0.2.2; the first server is asked second.
+  // Addresses sort as text: 192.0.2.1, 192.0.2.2; the host uses the first one second.
   void installTwoOfEach() {
     world.nic("eth1", {.servers = {"192.0.2.2", "192.0.2.1"}}).nic("eth0", {.servers = {"192.0.2.2"}}).install();
   }
@@ -217,7 +217,7 @@ TEST_F(RemoteAccessAvailableToElement, PathThatNamesNoPairGivesAnEmptyCompletedR
       server,
       server.key("Dependent", "eth0"),                     // a key that is no path
       server.key("Dependent", ref(Path(kEndpoint))),       // a path without keys
-      server.key("Dependent", ref(endpointPath("ETH0"))),  // values have case
+      server.key("Dependent", ref(endpointPath("ETH0"))),  // values are case-sensitive
       pair("192.0.2.1", "eth0").key("OrderOfAccess", uint16(1)),
       pair("192.0.2.1", "eth0").in("root/other"),
   };
@@ -478,14 +478,14 @@ TEST_F(RemoteAccessAvailableToElement, FarEndPathThatCouldNotBeMadeIsToldAndShow
               ElementsAre("CMPI_RC_ERR_FAILED", "not done, not marked", "Object Path is NULL in Associators."));
   EXPECT_THAT(failingTo(Mode::NullHandle, [this] { return associatorNames(endpointPath("eth0")); }),
               ElementsAre("CMPI_RC_OK", "not done, not marked", "Object Path is NULL in AssociatorNames."));
-  // The association's own path is made before the far end is looked at, and leaves its code.
+  // The association's own path is made before the far end is looked up, and its code stays in the status.
   EXPECT_THAT(failingTo(Mode::RcAndNull, [this] { return references(endpointPath("eth0")); }),
               ElementsAre("CMPI_RC_OK", "not done, not marked", "Object Path is NULL in References."));
 }
 
 TEST_F(RemoteAccessAvailableToElement, AssociationClassOfAnotherAssociationLeadsToItsFarEnd) {
   installOneOfEach();
-  // An end that this provider does not know: nothing, and yet a regular end.
+  // For an end that this provider does not know the result is empty, and the operation ends normally.
   for (const char* other : {"ZORVA_DNSSAPSAPDependency", "ZORVA_DNSHostedAccessPoint"}) {
     const Outcome found = associators(endpointPath("eth0"), {.assocClass = other});
     EXPECT_THAT(endOf(found), ElementsAre("CMPI_RC_OK", "not done, marked"));
@@ -493,7 +493,7 @@ TEST_F(RemoteAccessAvailableToElement, AssociationClassOfAnotherAssociationLeads
     EXPECT_THAT(endOf(associatorNames(endpointPath("eth0"), {.assocClass = other})),
                 ElementsAre("CMPI_RC_OK", "not done, marked"));
   }
-  // An end that both have: the endpoints of the source's system.
+  // Both associations have this end: the endpoints of the source's system.
   const Path setting = generalSettingPath().key("SystemName", "host1");
   const AssociationQuery other = {.assocClass = "ZORVA_DNSGenEndPointElementSettingData"};
   EXPECT_THAT(textsOf(associators(setting, other).instances(), "Name"), ElementsAre("eth0"));

@@ -7,8 +7,7 @@ namespace ZV {
 
 static const std::string loggerDNSRemoteSAP = "Zorvagent.DNSRemoteServiceAccessPointProvider";
 
-// A failure below leaves the result open: neither done nor marked as left, with the status as the broker's calls left
-// it.
+// A failure leaves the result open: no returnDone and no exit in the log. The status is what the broker's calls left.
 
 static CMPIStatus DNSRemoteServiceAccessPoint_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                                 const CMPIResult* result, const CMPIObjectPath* ref) {
@@ -44,7 +43,7 @@ static CMPIStatus DNSRemoteServiceAccessPoint_GetInstance(CMPIInstanceMI*, const
   const CMPIString* name = stringOf(getKey(ref, "Name", &operation.status));
   DNSClientObjFactory factory;
   std::vector<CMPIInstance*> instances;
-  if (isGood(name)) {  // the name alone decides; the other keys are not looked at
+  if (isGood(name)) {  // only the name decides; the other keys are ignored
     if (factory.getOneDNSServerCMPIInstance(broker, ref, const_cast<CMPIString*>(name), properties, instances,
                                             &operation.status) != 0) {
       return fail(operation, "getOneDNSServerCMPIInstance Failed");

@@ -1,4 +1,4 @@
-// What is the servers' own; what they share with the endpoints is tested in ReadOperations_test.cpp.
+// Reading the servers: only what differs from the endpoints. ReadOperations_test.cpp tests what both share.
 #include <ProviderCall.h>
 #include <World.h>
 #include <gmock/gmock.h>
@@ -67,7 +67,7 @@ TEST_F(Servers, OfTheServiceProcessorStandOnTheHostToo) {
   EXPECT_EQ(chars("host1"), outcome.instances()[0]["SystemName"]);
 }
 
-// A name is looked up as it is written, whatever address it means.
+// A name is compared as text, not as the address that it means.
 TEST_F(Servers, AddressIsFoundInItsOwnSpellingAlone) {
   world.nic("eth0", {.servers = {"2001:db8::1"}}).install();
   EXPECT_EQ(1U, provider.getInstance(kClass.key("Name", "2001:db8::1")).instances().size());

@@ -1,9 +1,9 @@
-// ZORVA_DNSSAPSAPDependency: the IP endpoint beneath each DNS endpoint. Instance and association provider; the IP
-// endpoints are served elsewhere and asked for through the broker.
+// ZORVA_DNSSAPSAPDependency: the IP endpoint below each DNS endpoint. Instance and association provider; the IP
+// endpoints are served by another provider and read through the broker.
 //
-// Two rules say what belongs together. The enumerations, and the associators of an IP endpoint, compare whole names.
-// The references, and the associators of a DNS endpoint, compare the first part of the IP endpoint's name, up to a "_",
-// with the DNS endpoint's: an interface's further addresses are named that way.
+// There are two rules for matching. The enumerations, and the associators of an IP endpoint, compare whole names. The
+// references, and the associators of a DNS endpoint, compare the first part of the IP endpoint's name, up to a "_",
+// with the DNS endpoint's name: an interface's further addresses are named that way.
 #include "factory/DNSClientObjFactory.h"
 #include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"
@@ -25,8 +25,8 @@ bool firstTokenEquals(const std::string& ipName, const std::string& dnsName) {
   return !tokens.empty() && tokens.front() == dnsName;
 }
 
-// Looks for the DNS endpoint of an IP endpoint's whole name: null where the path has no name or no endpoint has it.
-// False, with an error, where the look-up fails.
+// Finds the DNS endpoint with an IP endpoint's whole name: null if the path has no name or no endpoint has it. False,
+// with an error, if the look-up fails.
 bool findEndpoint(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* ipEndpoint, bool isObjPath,
                   const char** properties, CMPIInstance*& endpoint, const Place& place = Place::here()) {
   endpoint = nullptr;
@@ -69,7 +69,7 @@ static unsigned short DNSSAPSAPDependencyCMPIInstances(const CMPIContext* contex
   return 0;
 }
 
-// Delivers each path at once: a failure further on leaves what went out, and the result open.
+// Returns each path at once: after a later failure these paths are already delivered, and the result stays open.
 static CMPIStatus DNSSAPSAPDependency_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                         const CMPIResult* result, const CMPIObjectPath* ref) {
   Operation operation = ZV_OPERATION(loggerDNSSAPDependency, context, result, ref);
@@ -134,7 +134,7 @@ static CMPIStatus DNSSAPSAPDependency_Associators(CMPIAssociationMI*, const CMPI
       const CMPIInstance* ipEndpoint = nextInstance(ipEndpoints, &operation.status);
       if (!firstTokenEquals(propertyText(ipEndpoint, "Name", &operation.status), name)) continue;
       returnInstance(result, ipEndpoint);
-      break;  // the first match alone, where the references give all
+      break;  // only the first match; the references return all
     }
   } else if (farEnd.className == dnsProtocolEndPointClass) {
     if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) return operation.status;

@@ -60,12 +60,12 @@ class SAPSAPDependency : public AssociationTest {
   }
 };
 
-// --- Which names belong together
+// --- Which names match
 
 struct IpName {
   const char* name;
   bool isWhole;       // equals eth0
-  bool beginsWithIt;  // its first token does
+  bool beginsWithIt;  // its first token equals eth0
 };
 constexpr IpName kIpNames[] = {
     {"eth0", true, true},     {"eth0_1", false, true},      {"eth0_1_2", false, true}, {"eth0_", false, true},
@@ -468,7 +468,7 @@ TEST_F(SAPSAPDependency, AssociationClassOfAnotherAssociationLeadsToItsFarEnd) {
   const AssociationQuery servers = {.assocClass = "ZORVA_RemoteAccessAvailableToElement"};
   EXPECT_THAT(endOf(associators(endpointPath("eth0"), servers)), ElementsAre("CMPI_RC_OK", "not done, marked"));
   EXPECT_THAT(endOf(associatorNames(endpointPath("eth0"), servers)), ElementsAre("CMPI_RC_OK", "not done, marked"));
-  // An end that both have, by the source's name.
+  // Both associations have this end, found by the source's name.
   const AssociationQuery hosted = {.assocClass = "ZORVA_DNSHostedAccessPoint"};
   EXPECT_THAT(textsOf(associators(systemPath("eth0"), hosted).instances(), "Name"), ElementsAre("eth0"));
   EXPECT_THAT(associationProvider.associators(endpointPath("eth0"), {}).instances(), SizeIs(1));

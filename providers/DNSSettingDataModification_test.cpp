@@ -41,7 +41,7 @@ class DNSSettingDataModification : public ::testing::Test {
     const Deadline deadline;
     return provider_.modifyInstance(id("Computer%eth0"), instance);
   }
-  // The first file's value of a key now.
+  // The current value of a key in the first file.
   std::string inFile(const std::string& key) {
     const std::string content = "\n" + world_.fileContent("eth0").value_or("no file");
     const std::size_t found = content.find("\n" + key + "=");
@@ -137,12 +137,12 @@ TEST_F(DNSSettingDataModification, AnEmptyKeyMeansTheInterfaceWithoutANameAndThe
   EXPECT_NE(kFile, world_.fileContent("eth1"));
 }
 
-// --- what counts as present
+// --- which properties count as present
 
 TEST_F(DNSSettingDataModification, ServersAloneAreStoredAndTheConfigurationNameIsEmptied) {
   const Outcome outcome = modify(empty().with("DNSServerAddresses", texts({"192.0.2.1"})));
   EXPECT_THAT(valuesInFile(), ElementsAre("oldhost", "old.example.org", "192.0.2.1 ", ""));
-  EXPECT_EQ(broker_.missingProperty.rc, outcome.rc);  // what the broker said of the missing property
+  EXPECT_EQ(broker_.missingProperty.rc, outcome.rc);  // the broker's code for the missing property
   EXPECT_EQ(std::nullopt, outcome.message);
   EXPECT_THAT(outcome.errors(), IsEmpty());
   expectDoneWithoutExit(outcome);
@@ -194,7 +194,7 @@ TEST_F(DNSSettingDataModification, PropertiesThatTheBrokerFailsToGiveCountAsAbse
 TEST_F(DNSSettingDataModification, ATextThatTheBrokerFailsToGiveLeavesWhatIsStored) {
   struct Text {
     const char* property;
-    std::size_t call;  // that reads it
+    std::size_t call;  // the call that reads it
   };
   for (const Text& text : {Text{"RequestedHostname", 4}, Text{"DomainName", 5}, Text{"ConfigurationName", 7}}) {
     for (const Mode mode : {Mode::SetRc, Mode::RcAndNull}) {
@@ -294,7 +294,7 @@ TEST_F(DNSSettingDataModification, WhatIsNoDomainNameIsRefused) {
   }
 }
 
-// --- values that nobody should send
+// --- hostile values
 
 TEST_F(DNSSettingDataModification, QuotesAndLineFeedsOfTheConfigurationNameAreWrittenAsTheyAre) {
   EXPECT_EQ(CMPI_RC_OK, modify(whole().with("ConfigurationName", "\"it's\" #1\nDOMAINNAME=x")).rc);
@@ -328,7 +328,7 @@ TEST_F(DNSSettingDataModification, AHundredThousandServersAreWritten) {
   EXPECT_TRUE(value == inFile("DNSSERVERS"));
 }
 
-// --- nothing to write to
+// --- no file
 
 TEST_F(DNSSettingDataModification, AMissingFileIsASuccessAndStaysMissing) {
   std::filesystem::remove(world_.filePath("eth0"));

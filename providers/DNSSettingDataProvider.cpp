@@ -8,8 +8,7 @@ namespace ZV {
 
 static const std::string loggerDNSSettingDataProv = "Zorvagent.DNSSettingDataProvider";
 
-// A failure below leaves the result open: neither done nor marked as left, with the status as the broker's calls left
-// it.
+// A failure leaves the result open: no returnDone and no exit in the log. The status is what the broker's calls left.
 
 static CMPIStatus DNSSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
                                                    const CMPIResult* result, const CMPIObjectPath* ref) {
@@ -54,7 +53,7 @@ static CMPIStatus DNSSettingData_ModifyInstance(CMPIInstanceMI*, const CMPIConte
     operation.status.rc = static_cast<CMPIrc>(rc);
   }
   returnDone(result);
-  return {operation.status.rc, nullptr};  // no exit is marked
+  return {operation.status.rc, nullptr};  // no exit is logged
 }
 
 ZV_REFUSED_INSTANCE_OPERATIONS(DNSSettingData)

@@ -27,7 +27,7 @@ Path id(const char* instanceID) { return kClass.key("InstanceID", instanceID); }
 // Counts how often a file is opened.
 class OpenCounter {
  public:
-  // Closing is watched too, since the kernel makes one report of equal ones in a row.
+  // Watches closing too, because the kernel merges equal events in a row.
   explicit OpenCounter(const std::string& path) : inotify_(::inotify_init1(IN_NONBLOCK | IN_CLOEXEC)) {
     ::inotify_add_watch(inotify_, path.c_str(), IN_OPEN | IN_CLOSE);
   }
@@ -97,7 +97,7 @@ TEST_F(DNSSettingDataProviderTest, EnumeratedInstancesAreMadeFirstAndHandedOutTh
           "A2.setElementAt(0, uint16 8)", "A2.setElementAt(1, uint16 14)", "A2.setElementAt(2, uint16 17)",
           "I1.setProperty(\"DHCPOptionsToUse\", uint16[] {8, 14, 17})",
           "log 3000 EXITING makeDNSSettingDataInstance," + kMakeParameters,
-          // The second interface has no name, so it is asked with the file of the first.
+          // The second interface has no name, so its values are read from the file of the first.
           fileLine("eth0"), "log 3000 ENTERING makeDNSSettingDataInstance," + kMakeParameters,
           "newObjectPath(\"root/cimv2\", \"ZORVA_DNSSettingData\")", "OP2.setNameSpace(\"root/cimv2\")",
           "OP2.setHostname(\"host1\")", "newInstance(OP2)", "I2.setPropertyFilter(null, {\"InstanceID\"})",
@@ -174,7 +174,7 @@ TEST_F(DNSSettingDataProviderTest, LinesSayWhichSourceAndFunctionTheyAreFrom) {
   EXPECT_EQ("settings/DNSSettingData.cpp", cursor.file);
 }
 
-// --- what comes out
+// --- values
 
 TEST_F(DNSSettingDataProviderTest, ADomainNameAloneComesWithTheKeyAndReadsTheFileOnce) {
   world_.nic("eth0", usualNic()).install().file("eth0", "DOMAINNAME=d\n");

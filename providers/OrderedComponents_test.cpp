@@ -1,5 +1,5 @@
-// The two associations whose groups are IP assignment settings, which the broker is asked for: what can fail there, and
-// what fails alike in both.
+// The two associations whose groups are IP assignment settings, which are read through the broker: the failures that
+// only they can have, and those that are alike in both.
 #include "providers/testing/SettingAssociations.h"
 
 namespace ZV::Test {
@@ -35,7 +35,7 @@ const char* const kBadSetting = "CMPIObjectPath is NULL for DNS Client";
 
 const Path kAssignment = ipAssignmentPath("Computer%eth0%ipv4");
 
-// One interface with three assignments, which all belong to its setting, and to that of the host.
+// One interface with three assignments, which all belong to its setting and to the host's.
 class ComponentOfAssignments : public SettingAssociationTest, public ::testing::WithParamInterface<Component> {
  protected:
   ComponentOfAssignments()
@@ -47,7 +47,7 @@ class ComponentOfAssignments : public SettingAssociationTest, public ::testing::
   std::vector<Operation> instanceOperations() {
     return SettingAssociationTest::instanceOperations(pairOf(kAssignment, component.setting));
   }
-  // All that ask the broker for assignments.
+  // All operations that ask the broker for assignments.
   std::vector<Operation> allThatEnumerate() {
     std::vector<Operation> all = instanceOperations();
     for (const Operation& run : allFrom(component.setting)) all.push_back(run);

@@ -1,7 +1,7 @@
-// The frame that all twelve providers share: function tables, create functions, and the operations that do no work.
+// The frame of all twelve providers: function tables, create functions, and the operations that do no work.
 //
-// A provider's source includes this header once, defines its operations in namespace ZV as <Stem>_<Operation>, and
-// closes with the MI macros for the kinds that it serves. Each source has its own broker and its own tables.
+// A provider's source includes this header once, defines its operations in namespace ZV as <Stem>_<Operation>, and ends
+// with the MI macros for the kinds that it serves. Each source has its own broker and its own tables.
 #pragma once
 
 #include <cmpidt.h>
@@ -16,17 +16,17 @@
 
 #define ZV_PROVIDER_EXPORT extern "C" __attribute__((visibility("default")))
 
-// The version of the function tables, as all CMPI 2.x servers take it.
+// The version of the function tables that all CMPI 2.x servers accept.
 #define ZV_TABLE_VERSION 200
 
 namespace ZV {
 
-// Written by the source's create functions, the latest call winning, and read by its operations.
+// Set by the source's create functions, the last call wins; read by its operations.
 static const CMPIBroker* broker = nullptr;
 
 constexpr CMPIStatus kNotSupported = {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
 
-// A function table of these members. Later versions of CMPI have appended slots to the tables; they stay null.
+// A function table of these members. Later versions of CMPI have appended slots to the tables; those stay null.
 template <typename Table, typename... Members>
 constexpr Table tableOf(Members... members) {
   if constexpr (requires { Table{members..., nullptr}; }) {
@@ -38,8 +38,8 @@ constexpr Table tableOf(Members... members) {
 
 }  // namespace ZV
 
-// What no provider does: nothing is held across calls, so there is nothing to clean up, and no object can be made or
-// deleted by a client.
+// Operations that no provider implements: nothing is kept across calls, so there is nothing to clean up, and a client
+// can neither create nor delete an object.
 #define ZV_REFUSED_INSTANCE_OPERATIONS(stem)                                                                        \
   static CMPIStatus stem##_Cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) { return kStatusOk; }          \
   static CMPIStatus stem##_CreateInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,                   \
@@ -65,7 +65,7 @@ constexpr Table tableOf(Members... members) {
 #define ZV_ASSOCIATION_CLEANUP(stem) \
   static CMPIStatus stem##_AssociationCleanup(CMPIAssociationMI*, const CMPIContext*, CMPIBoolean) { return kStatusOk; }
 
-// The table of a provider's instance operations and the create function that hands it out.
+// The table of a provider's instance operations and the create function that returns it.
 #define ZV_INSTANCE_MI(prefix, stem)                                                                                 \
   namespace ZV {                                                                                                     \
   static constinit CMPIInstanceMIFT instMIFT__ = tableOf<CMPIInstanceMIFT>(                                          \

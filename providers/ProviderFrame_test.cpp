@@ -1,4 +1,4 @@
-// What all twelve providers have alike: create functions, function tables, and the operations that do no work.
+// Common to all twelve providers: create functions, function tables, and the operations that do no work.
 #include <ProviderCall.h>
 #include <World.h>
 #include <gmock/gmock.h>
@@ -38,7 +38,7 @@ namespace {
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
-// A provider by the names that the outside and the log know it by. The names differ in places, and so they shall.
+// The names of a provider: for CIM servers and in the log. They differ in places, and must not be changed.
 struct Provider {
   InstanceProvider::Create create;
   AssociationProvider::Create createAssociation;  // null: it has none
@@ -82,13 +82,13 @@ bool isModifiable(const Provider& provider) {
   return std::set<std::string>{"DNSClient", "DNSSettingData", "DNSGeneralSettingData"}.contains(provider.stem);
 }
 
-// The source's name, but for the one whose category keeps the long word.
+// The source's name, except for the provider whose category keeps the long word.
 std::string categoryOf(const Provider& provider) {
   const std::string source = provider.source;
   return "Zorvagent." + (source == "DNSGenOrderedComponentProvider" ? "DNSGeneralOrderedComponentProvider" : source);
 }
 
-// Did nothing, and said nothing.
+// The call did nothing and logged nothing.
 void expectNoWork(const Outcome& outcome, CMPIrc rc) {
   EXPECT_EQ(rc, outcome.rc);
   EXPECT_EQ(std::nullopt, outcome.message);

@@ -1,4 +1,4 @@
-// Reading the endpoints and the servers: two providers of one build, each with its own words.
+// Reading the endpoints and the servers: two providers that work alike and differ in their texts.
 #include <ProviderCall.h>
 #include <World.h>
 #include <gmock/gmock.h>
@@ -17,7 +17,7 @@ using ::testing::Contains;
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
-// One of the two providers, and the words in which it fails.
+// One of the two providers, and its error texts.
 struct Reader {
   InstanceProvider::Create create;
   const char* stem;
@@ -65,7 +65,7 @@ class Reading : public ::testing::TestWithParam<Reader> {
   }
   static std::string operation(const std::string& name) { return std::string(GetParam().stem) + "_" + name; }
 
-  // The line of an error, which must tell of the operation and its file.
+  // The line of an error, which must name the operation and its file.
   static void expectErrorsOf(const Outcome& outcome, const std::string& name, const char* inFactory,
                              const char* inProvider) {
     ASSERT_THAT(outcome.errors(), ElementsAre(inFactory, inProvider)) << outcome;
@@ -79,7 +79,7 @@ class Reading : public ::testing::TestWithParam<Reader> {
     const LogLines factory = outcome.lines.ofCategory("Zorvagent.DNSObjFactory");
     EXPECT_THAT(factory.errors(), ElementsAre(inFactory));
   }
-  // Neither done nor marked as left, and with nothing in it.
+  // Neither returnDone nor an exit line, and no results.
   static void expectLeftOpen(const Outcome& outcome, CMPIrc rc = CMPI_RC_OK) {
     EXPECT_EQ(rc, outcome.rc) << outcome;
     EXPECT_TRUE(outcome.markedEntry());
@@ -87,7 +87,7 @@ class Reading : public ::testing::TestWithParam<Reader> {
     EXPECT_FALSE(outcome.markedExit());
     EXPECT_THAT(outcome.calls.only({"returnInstance", "returnObjectPath"}), IsEmpty());
   }
-  // Done, and then marked as left.
+  // returnDone, then the exit line.
   static void expectComplete(const Outcome& outcome, const std::string& name, CMPIrc rc = CMPI_RC_OK) {
     EXPECT_EQ(rc, outcome.rc) << outcome;
     EXPECT_TRUE(outcome.markedEntry());
@@ -316,7 +316,7 @@ TEST_P(Reading, PathWithoutANameOnAnEmptyHostLeavesTheResultOpenWithTheStatusOfT
   expectErrorsOf(outcome, "GetInstance", "***No instance found***", GetParam().instancesFailed);
 }
 
-// A name that cannot be read as text is as good as none: then all keys count.
+// A name that cannot be read as text counts as missing: then all keys count.
 TEST_P(Reading, ScanComparesAllKeysAndStopsAtTheMatch) {
   haveBoth();
   broker.failNext("getKey", Mode::NullHandle);
@@ -414,7 +414,7 @@ TEST_P(Reading, LetsAnExceptionOfTheBrokerPass) {
 TEST_P(Reading, FailureOfTheTreeLeavesWhatWasRead) {
   haveBoth();
   std::size_t openResults = 0;
-  for (std::size_t n = 2;; ++n) {  // the first call stands unguarded
+  for (std::size_t n = 2;; ++n) {  // the first call is outside the try block
     const FailingTree failing(n);
     const Outcome outcome = provider.enumerateInstances(classPath());
     if (!failing.hasThrown()) break;

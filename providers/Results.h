@@ -1,4 +1,4 @@
-// Gathering what the factory has, and handing it out.
+// Gathers the factory's objects and returns them as results.
 #pragma once
 
 #include <cmpidt.h>
@@ -10,7 +10,7 @@
 
 namespace ZV {
 
-// All endpoints or servers, with the namespace of the path. False where the factory fails.
+// All endpoints or servers, with the namespace of the path. False if the factory fails.
 bool fetchEndpoints(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
                     std::vector<CMPIObjectPath*>& endpoints);
 bool fetchEndpoints(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,

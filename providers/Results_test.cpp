@@ -104,7 +104,7 @@ TEST_F(ResultsOfAnOperation, InstancesThatAreNullOrWithoutHandleOrPathArePassedO
 }
 
 TEST_F(ResultsOfAnOperation, ReferencesAreComparedAsPathsOnlyWhereTheKeysAreSaidToBeSome) {
-  const Path withoutNameSpace = end("b").in("");  // stands for that of the enclosing path
+  const Path withoutNameSpace = end("b").in("");  // means the namespace of the enclosing path
   returnFirstEqual(result, requested(end("a"), withoutNameSpace), {one}, false, &status);
   EXPECT_THAT(returned(), IsEmpty());
   returnFirstEqual(result, requested(end("a"), withoutNameSpace), {one}, true, &status);

@@ -1,4 +1,4 @@
-// What holds of all four associations of DNS settings alike.
+// Tests that hold for all four associations of DNS settings.
 #include "providers/testing/SettingAssociations.h"
 
 #include <cctype>
@@ -11,7 +11,7 @@ using ::testing::IsEmpty;
 using ::testing::SizeIs;
 
 struct End {
-  Path path;  // of an object that stands at this end
+  Path path;  // of an object at this end
   const char* ownName;
   const char* cimName;
   const char* baseName;   // of a base class of it
@@ -22,7 +22,7 @@ struct End {
 struct Stranger {
   const char* association;
   Path source;
-  std::vector<std::string> end;  // as endOf tells it
+  std::vector<std::string> end;  // as endOf() returns it
   std::size_t results;
 };
 
@@ -157,7 +157,8 @@ TEST_P(SettingAssociation, SourceOfNeitherEndIsToldAndLeftOpen) {
   for (const auto& [operationName, outcome] : fourFrom(serverPath("192.0.2.1"))) {
     SCOPED_TRACE(operationName);
     const bool isReference = std::string_view(operationName).starts_with("Reference");
-    // The path of the association is made before the far end is looked at; the names of one are those of its sister.
+    // The path of the association is made before the far end is looked up; the names of one have the class of the
+    // sibling association.
     const bool isSister =
         std::string_view(operationName) == "ReferenceNames" && name == "ZORVA_DNSGenEndPointElementSettingData";
     EXPECT_EQ(
@@ -205,7 +206,8 @@ TEST_P(SettingAssociation, OmittedAssociationClassIsTheProvidersOwn) {
   }
 }
 
-// The far end of the other association is looked for: it is neither of this one's, or by chance the same.
+// The far end of the other association is looked up: it is not one of this association's ends, or is the same by
+// chance.
 TEST_P(SettingAssociation, OtherAssociationOfTheLibraryIsLookedUpAsItIs) {
   for (const Stranger& stranger : association.strangers) {
     SCOPED_TRACE(std::string(stranger.association) + " from " + describe(stranger.source));
@@ -389,7 +391,8 @@ TEST_P(SettingAssociation, StatusOfABuiltPairIsNotLookedAt) {
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);
 }
 
-// The reference itself is not tested: a broker that makes none is handed none, and its code is the operation's.
+// The reference itself is not checked: if a broker makes none, it gets null as argument, and its code is the
+// operation's.
 TEST_P(SettingAssociation, ReferenceThatCannotBeMadeIsHandedOnAsItIs) {
   for (const Direction& direction : directions()) {
     const auto run = [this, &direction] { return references(direction.source.path); };
@@ -430,7 +433,7 @@ TEST_P(SettingAssociation, FarEndThatCannotBeMadeIsToldAndShowsTheBrokersCode) {
                   ElementsAre(code, "not done, not marked", "Object Path is NULL in Associators."));
       EXPECT_THAT(fails([&] { return associatorNames(source); }),
                   ElementsAre(code, "not done, not marked", "Object Path is NULL in Associators."));
-      // The association's path is made after it, and what that leaves in the status is the end of it.
+      // The association's path is made after it, and the operation ends with the code that this leaves in the status.
       EXPECT_THAT(fails([&] { return references(source); }),
                   ElementsAre("CMPI_RC_OK", "not done, not marked", "Object Path is NULL in References."));
       EXPECT_THAT(fails([&] { return referenceNames(source); }),
@@ -458,8 +461,8 @@ TEST_P(SettingAssociation, NoObjectIsEverReleasedOrCloned) {
 
 TEST_P(SettingAssociation, SurvivesEveryFailureOfTheBroker) { expectToSurviveEveryFailure(requests()); }
 
-// What the tree throws may leave the provider, and nothing else may; but for the one exception that is the provider's
-// own, where a tree that fails leaves no settings to pair.
+// Only the tree's exceptions may leave the provider. The one exception of the provider's own is allowed where a failing
+// tree leaves no settings to pair.
 TEST_P(SettingAssociation, SurvivesEveryFailureOfTheTree) {
   const bool mayBeOutOfRange = under.stem == "DNSGeneralOrderedComponent";
   for (const Request& request : requests()) {

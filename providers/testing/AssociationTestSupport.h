@@ -1,5 +1,5 @@
-// What the tests of the eight association providers share: the objects at their ends, the words in which a request's
-// story is told, and ways to make one call among many fail.
+// Shared by the tests of the eight association providers: the objects at their ends, the texts of the recorded calls
+// and log lines, and ways to make one call among many fail.
 #pragma once
 
 #include <gmock/gmock.h>
@@ -69,13 +69,13 @@ inline std::vector<std::string> textsOf(const std::vector<Instance>& instances, 
   return all;
 }
 
-// What tells an object from its siblings: its Name or InstanceID, or its class where it has no keys.
+// The text that identifies an object: its Name or InstanceID, or its class if it has no keys.
 inline std::string nameOfEnd(const Path& path) {
   if (path.keys.empty()) return path.className;
   return (path["InstanceID"].isNull() ? path["Name"] : path["InstanceID"]).text();
 }
 
-// --- A request's story: the provider's own log lines, and every call that makes, changes or hands out something.
+// --- The record of a request: the provider's own log lines, and every call that makes, changes or returns something.
 
 using Story = std::vector<std::string>;
 
@@ -126,7 +126,7 @@ inline Story textProperties(const std::string& instance,
   }
   return all;
 }
-// An endpoint or server with its keys alone; filter is the setPropertyFilter's list as a call shows it, empty for none.
+// An endpoint or server with its keys only; filter is the setPropertyFilter's list as a call shows it, empty for none.
 inline Story newObjectOnSystem(const std::string& path, const std::string& instance, const std::string& className,
                                const std::string& name, const std::string& filter) {
   const std::string keys = R"({"SystemCreationClassName", "CreationClassName", "SystemName", "Name"})";
@@ -149,8 +149,8 @@ inline Story newServer(const std::string& path, const std::string& instance, con
 
 // --- Failures that no slot can make on its own.
 
-// Paths of one class lose their handles when a path of another class is made, as if the server took its memory back too
-// early. One at a time; the provider is handed this broker by its create function.
+// Paths of one class lose their handles when a path of another class is made, as if the server freed them too early.
+// One at a time; the provider gets this broker by its create function.
 class HandleThief {
  public:
   HandleThief(const RecordingBroker& broker, std::string victims, std::string occasion)
@@ -194,15 +194,15 @@ struct AssociationUnderTest {
   std::string right;
   std::string stem;      // of its operations' names
   std::string builder;   // the function that gathers all instances
-  std::string source;    // as its log lines tell it
+  std::string source;    // as its log lines name it
   std::string category;  // of its log lines
   InstanceProvider::Create createInstanceMI;
   AssociationProvider::Create createAssociationMI;
   bool associationsAreDone;  // whether the four association operations call returnDone
 };
 
-// An association provider on a world that the test fills and installs. Whatever a request logs in the provider's
-// category is checked to name the provider's own source and the operation, or the builder, as its place.
+// An association provider on a world that the test fills and installs. All lines of a request in the provider's
+// category are checked: their place must be the provider's own source and the operation, or the builder.
 class AssociationTest : public ::testing::Test {
  protected:
   explicit AssociationTest(AssociationUnderTest provider)
@@ -215,7 +215,7 @@ class AssociationTest : public ::testing::Test {
     return associationClass().key(under.left, ref(left)).key(under.right, ref(right));
   }
 
-  // The associations that a request gave, in order, as `left > right`.
+  // The associations that a request returned, in order, as `left > right`.
   std::vector<std::string> pairsOf(const Outcome& outcome) const {
     std::vector<std::string> all;
     const auto add = [&](const Value& left, const Value& right) {
@@ -226,7 +226,7 @@ class AssociationTest : public ::testing::Test {
     return all;
   }
 
-  // What a story says where an association gets its two references.
+  // The calls that give an association its two references.
   Story keyEnds(const std::string& path, const std::string& left, const std::string& right) const {
     return {path + ".addKey(\"" + under.left + "\", ref " + left + ")",
             path + ".addKey(\"" + under.right + "\", ref " + right + ")"};
@@ -245,7 +245,7 @@ class AssociationTest : public ::testing::Test {
   Outcome getInstance(const Path& path, const PropertyList& properties = nullptr) {
     return checked("GetInstance", instanceProvider.getInstance(path, properties));
   }
-  // A query without an association class is asked for the provider's own.
+  // A query without an association class names the provider's own.
   Outcome associators(const Path& path, AssociationQuery query = {}) {
     return checked("Associators", associationProvider.associators(path, forOwnClass(query)));
   }
@@ -261,7 +261,7 @@ class AssociationTest : public ::testing::Test {
 
   std::string operation(const std::string& name) const { return under.stem + "_" + name; }
 
-  // The calls and the provider's own lines, without those of what stands below it, and the code where there is one.
+  // The calls and the provider's own lines, without those of the folders below it, and the code if there is one.
   Story storyOf(const Outcome& outcome) const {
     Outcome own = outcome;
     own.lines = outcome.lines.ofCategory(under.category);
@@ -269,18 +269,18 @@ class AssociationTest : public ::testing::Test {
     if (outcome.rc != CMPI_RC_OK) story.push_back(nameOf(outcome.rc));
     return story;
   }
-  // What the provider itself complains of.
+  // The errors that the provider itself wrote.
   std::vector<std::string> complaintsOf(const Outcome& outcome) const {
     return outcome.lines.ofCategory(under.category).errors();
   }
-  // How a request ended: its code, what is left open, and the provider's complaints.
+  // How a request ended: its code, whether it was left open, and the provider's errors.
   std::vector<std::string> endOf(const Outcome& outcome) const {
     std::vector<std::string> all = {nameOf(outcome.rc), closingOf(outcome)};
     for (const std::string& text : complaintsOf(outcome)) all.push_back(text);
     return all;
   }
 
-  // Runs the operation with the n-th call whose line holds that text failing.
+  // Runs the operation while the n-th call whose line contains that text fails.
   Outcome failing(const std::string& line, Mode mode, const std::function<Outcome()>& run, std::size_t n = 1) {
     broker.startOver();
     run();
@@ -324,8 +324,8 @@ class AssociationTest : public ::testing::Test {
     return all;
   }
 
-  // Both associator operations give `count` objects for each result class that passes, and end at once, with nothing
-  // and without a word, for each that does not.
+  // Both associator operations return `count` objects for each accepted result class. For any other class they end at
+  // once, with no objects and no log line.
   void expectResultClasses(const Path& source, std::size_t count, std::initializer_list<const char*> passing,
                            std::initializer_list<const char*> refused) {
     for (const char* resultClass : passing) {
@@ -343,7 +343,7 @@ class AssociationTest : public ::testing::Test {
     }
   }
 
-  // A source of a class at neither end: the four operations complain with these texts, give nothing and leave open.
+  // A source of a class at neither end: the four operations log these texts, return nothing and leave the result open.
   void expectNoFarEnd(const Path& source, std::initializer_list<const char*> texts) {
     const Outcome outcomes[] = {associators(source), associatorNames(source), references(source),
                                 referenceNames(source)};
@@ -354,7 +354,7 @@ class AssociationTest : public ::testing::Test {
     }
   }
 
-  // The arguments that no association operation reads, and the host of the source, make no difference to anything.
+  // The arguments that no association operation reads, and the host of the source, do not change any result.
   void expectUnreadArgumentsIgnored(const Path& source) {
     const Path elsewhere = source.on("elsewhere");
     EXPECT_EQ(storyOf(associators(source)), storyOf(associators(elsewhere)));
@@ -372,11 +372,11 @@ class AssociationTest : public ::testing::Test {
   // A request that asks the broker for objects of a class that another provider serves.
   struct UpCall {
     std::function<Outcome()> run;
-    const char* text;  // told when that fails
-    bool showsCode;    // whether the request then ends at once with the broker's code; or else completes without it
+    const char* text;  // logged when that fails
+    bool showsCode;    // whether the request then ends at once with the broker's code; else it completes without it
   };
 
-  // The other provider is missing, fails, gives nothing, gives objects without handles, stops half way, or throws.
+  // The other provider is missing, fails, returns nothing, returns objects without handles, stops half way, or throws.
   void expectToEndAsTheOtherProviderHasIt(const std::string& otherClass, const std::vector<Instance>& objects,
                                           const std::vector<UpCall>& upCalls) {
     for (const UpCall& upCall : upCalls) {
@@ -387,9 +387,9 @@ class AssociationTest : public ::testing::Test {
                                            upCall.showsCode ? "not done, not marked" : "done, marked", upCall.text));
         EXPECT_EQ(0U, outcome.instances().size() + outcome.paths().size());
       };
-      broker.serve(otherClass).rc = CMPI_RC_ERR_INVALID_CLASS;  // as where no provider serves it
+      broker.serve(otherClass).rc = CMPI_RC_ERR_INVALID_CLASS;  // as if no provider served it
       expectFailure("CMPI_RC_ERR_INVALID_CLASS", upCall.run());
-      broker.serve(otherClass, objects).rc = CMPI_RC_ERR_NOT_SUPPORTED;  // and objects beside the code
+      broker.serve(otherClass, objects).rc = CMPI_RC_ERR_NOT_SUPPORTED;  // and objects in addition to the code
       expectFailure("CMPI_RC_ERR_NOT_SUPPORTED", upCall.run());
 
       broker.serve(otherClass).nullEnumeration = true;
@@ -410,7 +410,7 @@ class AssociationTest : public ::testing::Test {
     }
   }
 
-  // All that is made lies in the request's namespace, whichever that is.
+  // All objects that are made have the request's namespace.
   void expectTheRequestsNamespaceEverywhere(const Path& left, const Path& right) {
     const std::vector<Request> usual = allRequests(pairOf(left, right), left, right);
     std::vector<Story> stories;
@@ -429,7 +429,7 @@ class AssociationTest : public ::testing::Test {
     }
   }
 
-  // The broker writes the context of an up-call where it is another than the operation's.
+  // An up-call gets the operation's context; the record shows the context only if it is another one.
   void expectUpCallsInTheOperationsContext(const std::vector<Request>& requests, std::size_t count) {
     for (const Request& request : requests) {
       const Outcome outcome = request.run();
@@ -441,11 +441,11 @@ class AssociationTest : public ::testing::Test {
     EXPECT_EQ(0U, count) << "up-calls fewer than awaited, or more";
   }
 
-  // What holds of a request whatever failed beneath it.
+  // True of a request, whatever failed below it.
   void expectRegularEnd(const std::string& name, const Outcome& outcome) {
     const std::string closing = closingOf(outcome);
     if (name == "EnumInstances" || name == "GetInstance") {
-      EXPECT_EQ("done, marked", closing);  // a failure below never shows
+      EXPECT_EQ("done, marked", closing);  // a failure below is never shown
     } else if (name == "EnumInstanceNames" || under.associationsAreDone) {
       EXPECT_THAT(closing, ::testing::AnyOf("done, marked", "not done, not marked"));
     } else {
@@ -457,7 +457,7 @@ class AssociationTest : public ::testing::Test {
     EXPECT_LE(outcome.calls.count("returnDone"), 1U);
   }
 
-  // Each call of each request fails in each way, exceptions included, which pass on to the server as they are.
+  // Each call of each request fails in each way, exceptions included, which the server gets unchanged.
   void expectToSurviveEveryFailure(const std::vector<Request>& requests) {
     for (const Request& request : requests) {
       SCOPED_TRACE(request.name);
@@ -485,8 +485,8 @@ class AssociationTest : public ::testing::Test {
     }
   }
 
-  // The tree fails at each of its calls. A request may end as its exception has it where that was no std::exception,
-  // or flew out of one of the calls that are named here.
+  // The tree fails at each of its calls. The request may end with the exception if it is no std::exception, or if it
+  // came from one of the calls that are named here.
   void expectToSurviveEveryTreeFailure(const std::vector<Request>& requests,
                                        const std::set<zorva::agent::TreeCall>& unguarded) {
     for (const Request& request : requests) {

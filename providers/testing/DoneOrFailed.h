@@ -1,4 +1,4 @@
-// What every read operation of the setting data looks like when it has ended.
+// The end of every reading operation of the setting data.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -9,7 +9,7 @@ namespace ZV::Test {
 
 inline bool calledDone(const Outcome& outcome) { return outcome.calls.count("returnDone") == 1; }
 
-// Either done and marked as left, or neither, and then an error is the last that is heard of it.
+// Either returnDone and an exit line, or neither; then the last log line is an error.
 inline void expectDoneOrFailed(const Outcome& outcome) {
   EXPECT_TRUE(outcome.markedEntry());
   EXPECT_EQ(calledDone(outcome), outcome.markedExit()) << outcome;

@@ -1,4 +1,4 @@
-// What the tests of ModifyInstance of the three classes share.
+// Shared by the tests of ModifyInstance of the three classes.
 #pragma once
 
 #include <gmock/gmock.h>
@@ -18,14 +18,14 @@ inline std::vector<std::string> writeLines(const std::string& file, const std::s
           "log 4000 VARIABLE propValue = " + value};
 }
 
-// Several pieces of a story as one.
+// Joins several pieces of a record.
 inline std::vector<std::string> joined(const std::vector<std::vector<std::string>>& parts) {
   std::vector<std::string> all;
   for (const auto& part : parts) all.insert(all.end(), part.begin(), part.end());
   return all;
 }
 
-// A modification closes its result and marks no exit, also where it failed with a code of its own.
+// A modification closes its result and logs no exit, even if it failed with its own code.
 inline void expectDoneWithoutExit(const Outcome& outcome) {
   EXPECT_TRUE(outcome.markedEntry());
   EXPECT_EQ(1U, outcome.calls.count("returnDone"));

@@ -1,4 +1,4 @@
-// The four associations of DNS settings as their tests share them.
+// The four associations of DNS settings for their shared tests.
 #pragma once
 
 #include <functional>
@@ -82,7 +82,7 @@ inline const char* const kSettingClass = "ZORVA_DNSSettingData";
 inline const char* const kEndpointClass = "ZORVA_DNSProtocolEndPoint";
 inline const char* const kIpAssignmentClass = "ZORVA_IPAssignmentSettingData";
 
-// --- Parts of a story.
+// --- Parts of a record.
 
 inline std::string inRootCimv2(const std::string& path) { return path + ".setNameSpace(\"root/cimv2\")"; }
 
@@ -90,7 +90,7 @@ inline Story newSettingPath(const std::string& path, const std::string& instance
   return tell({newHostPath(path, kSettingClass), textKeys(path, {{"InstanceID", instanceID}})});
 }
 
-// A setting with its key alone, asked for by that name.
+// A setting with its key only, requested by that name.
 inline Story newSetting(const std::string& path, const std::string& instance, const std::string& className,
                         const std::string& instanceID) {
   return tell({newHostPath(path, className),
@@ -107,7 +107,7 @@ inline Story sequence(const std::string& instance, int value) {
   return {instance + R"(.setProperty("AssignedSequence", uint64 )" + std::to_string(value) + ")"};
 }
 
-// The name of a reference goes out with the namespace of the source.
+// The name of a reference is returned with the namespace of the source.
 inline Story returnedPath(const std::string& instance, const std::string& path) {
   return {instance + ".getObjectPath()", inRootCimv2(path), "returnObjectPath(" + path + ")"};
 }
@@ -134,7 +134,7 @@ class SettingAssociationTest : public AssociationTest {
     return {[this, source] { return associators(source); }, [this, source] { return associatorNames(source); },
             [this, source] { return references(source); }, [this, source] { return referenceNames(source); }};
   }
-  // Those of them that fetch no instances, but paths, of what the factory makes.
+  // The operations that fetch only paths from the factory, no instances.
   std::vector<Operation> pathsFrom(const Path& source) {
     std::vector<Operation> all = allFrom(source);
     all.erase(all.begin());
@@ -147,7 +147,7 @@ class SettingAssociationTest : public AssociationTest {
     broker.serve(kIpAssignmentClass, all);
   }
 
-  // How many objects were handed out, null ones included.
+  // How many objects were returned, null ones included.
   static std::size_t handedOut(const Outcome& outcome) {
     return outcome.calls.count("returnInstance") + outcome.calls.count("returnObjectPath");
   }
