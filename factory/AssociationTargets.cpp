@@ -1,4 +1,4 @@
-// The factory's share in the associations: which class stands at the far end, its path, the endpoint of an interface.
+// The factory's functions for associations: the class at the far end, its path, the endpoint of an interface.
 #include <cstring>
 
 #include "factory/CmpiSupport.h"
@@ -29,10 +29,10 @@ struct Target {
   const char* sourceClass;
   const char* associationClass;
   const char* targetClass;
-  const char* text;  // null: found without a word
+  const char* text;  // null: found without a log line
 };
 
-// Some texts do not repeat the class's spelling; they are what operators' filters know.
+// Some texts spell the class in another way; operators' log filters know these texts.
 const Target kTargets[] = {
     {dnsProtocolEndPointClass, remoteAccessAvailableToElementClass, remoteServiceAccessPointClass,
      "Target Class is ZORVA_RemoteServiceAccessPoint"},

@@ -71,7 +71,7 @@ class AssociationTargets : public ::testing::Test {
     broker.startOver();
     return DNSClientObjFactory().get_assoc_targetClass_ObjectPath(broker.cmpi(), ref, association, nullptr, &status);
   }
-  // The instance that the look-up left in a slot that held `before`.
+  // The instance in a slot that held `before` after the look-up.
   CMPIInstance* endpointOf(const std::string& interface, CMPIInstance* before = nullptr, bool isObjPath = true,
                            const char** properties = nullptr) {
     const CMPIObjectPath* ref = broker.make(Path("ZORVA_X", "root/lab"), "ref");

@@ -10,7 +10,7 @@ namespace {
 
 constexpr CMPIData kNoData = {CMPI_null, CMPI_nullValue, {}};
 
-// The function tables take text values as the pointer itself, in the place of the pointer to a value.
+// For text values, the function tables take the text's pointer itself, not a pointer to a value.
 const CMPIValue* asValue(const char* text) { return reinterpret_cast<const CMPIValue*>(text); }
 
 template <typename Member, typename Value>

@@ -11,7 +11,7 @@ namespace {
 
 using ::testing::IsEmpty;
 
-// What a function of the factories gave is perhaps nothing, or an object without a handle: it is not used then.
+// A factory function may return null, or an object without a handle: then it is not used.
 class CmpiSupport : public ::testing::Test {
  protected:
   CMPIObjectPath* path(const char* className) { return broker_.make(Path(className)); }

@@ -24,7 +24,8 @@ std::string localised(const wchar_t* key) {
   return make_string(ResourceString(Locale::getResourceLibrary(kDNSResourceLibrary, Locale::getLanguageId()), key));
 }
 
-// The host's own endpoints stand on the system that is named; those of the service processor on a name that is fixed.
+// The host's own endpoints are on the system with the given name; those of the service processor are on a system with a
+// fixed name.
 std::string systemNameFor(const DNSClient& client) {
   return strcasecmp(client.getDNSSCCN().c_str(), computerSystemClass) == 0 ? getSystemName() : "BMC:-1";
 }
@@ -33,7 +34,7 @@ const std::vector<const char*> kSystemKeys = {"SystemCreationClassName", "Creati
 
 }  // namespace
 
-// What a failed read of the endpoints left in the map is used as it stands.
+// If reading the endpoints fails, the records read before are used.
 DNSClientObjFactory::DNSClientObjFactory() {
   if (getDNSClientInstances(dnsClientMap) == 0) getDNSServerInstances(dnsServerMap);
 }
@@ -65,7 +66,7 @@ unsigned short DNSClientObjFactory::getAllDNSClientCMPIObjPaths(const CMPIBroker
 
 namespace {
 
-// False where the broker makes no array.
+// False if the broker makes no array.
 bool setSuffixes(const CMPIBroker* broker, const CMPIInstance* instance, const std::vector<std::string>& suffixes,
                  const char* function, CMPIStatus* rc) {
   const unsigned short dnsSuffixesSize = count16(suffixes);
@@ -255,7 +256,7 @@ unsigned short DNSClientObjFactory::getOrderOfAccess(const CMPIBroker* _broker, 
   const auto found = dnsServerMap.find(serverName);
   if (found != dnsServerMap.end()) return found->second.getOrderOfAccess();
   flow.exit();
-  return 1;  // as for the first server: the caller cannot tell a miss from a hit
+  return 1;  // same as for the first server: the caller cannot see that it was not found
 }
 
 }  // namespace ZV

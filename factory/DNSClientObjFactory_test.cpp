@@ -459,17 +459,18 @@ TEST_F(Factory, FunctionsTellTheirArgumentsOnTheWayInAndOut) {
   const std::string pathArguments = ", broker=ADDR ref=ADDR objectPaths=ADDR status=ADDR";
   const std::string allArguments = ", broker=ADDR ref=ADDR properties=0 isObjPath=1 instances=ADDR rc=ADDR";
   const std::string oneArguments = ", broker=ADDR objectPath=ADDR key=ADDR properties=0 instances=ADDR status=ADDR";
-  EXPECT_THAT(lines, ElementsAre("3000 ENTERING getAllDNSClientCMPIObjPaths" + pathArguments,  // the one without exit
-                                 "3000 ENTERING getAllDNSServerCMPIObjPaths" + pathArguments,
-                                 "3000 EXITING getAllDNSServerCMPIObjPaths" + pathArguments,
-                                 "3000 ENTERING getAllDNSClientCMPIInstances" + allArguments,
-                                 "3000 EXITING getAllDNSClientCMPIInstances" + allArguments,
-                                 "3000 ENTERING getAllDNSServerCMPIInstances" + allArguments,
-                                 "3000 EXITING getAllDNSServerCMPIInstances" + allArguments,
-                                 "3000 ENTERING getOneDNSClientCMPIInstance" + oneArguments,
-                                 "3000 EXITING getOneDNSClientCMPIInstance" + oneArguments,
-                                 "3000 ENTERING getOneDNSServerCMPIInstance" + oneArguments,
-                                 "3000 EXITING getOneDNSServerCMPIInstance" + oneArguments));
+  EXPECT_THAT(
+      lines, ElementsAre("3000 ENTERING getAllDNSClientCMPIObjPaths" + pathArguments,  // the function that logs no exit
+                         "3000 ENTERING getAllDNSServerCMPIObjPaths" + pathArguments,
+                         "3000 EXITING getAllDNSServerCMPIObjPaths" + pathArguments,
+                         "3000 ENTERING getAllDNSClientCMPIInstances" + allArguments,
+                         "3000 EXITING getAllDNSClientCMPIInstances" + allArguments,
+                         "3000 ENTERING getAllDNSServerCMPIInstances" + allArguments,
+                         "3000 EXITING getAllDNSServerCMPIInstances" + allArguments,
+                         "3000 ENTERING getOneDNSClientCMPIInstance" + oneArguments,
+                         "3000 EXITING getOneDNSClientCMPIInstance" + oneArguments,
+                         "3000 ENTERING getOneDNSServerCMPIInstance" + oneArguments,
+                         "3000 EXITING getOneDNSServerCMPIInstance" + oneArguments));
   EXPECT_EQ(2U, paths.size());
   EXPECT_EQ(4U, instances.size());
 }
@@ -489,7 +490,7 @@ TEST_F(Factory, EmptyMapsAreFailuresThatTouchNoStatus) {
   const LogLines lines = logger.pairs();
   EXPECT_THAT(lines.errors(), ElementsAre("No ObjectPath Found", "No ObjectPath found", "***No instance found***",
                                           "***No instance found***"));
-  EXPECT_TRUE(lines.exited("getAllDNSClientCMPIInstances"));  // the one that marks its exit
+  EXPECT_TRUE(lines.exited("getAllDNSClientCMPIInstances"));  // the function that logs its exit
   EXPECT_FALSE(lines.exited("getAllDNSServerCMPIInstances"));
   EXPECT_FALSE(lines.exited("getAllDNSClientCMPIObjPaths"));
   EXPECT_FALSE(lines.exited("getAllDNSServerCMPIObjPaths"));
@@ -543,7 +544,7 @@ TEST_F(Factory, InstanceThatIsNotMadeStandsInTheResult) {
   EXPECT_EQ(std::vector<CMPIInstance*>(4, nullptr), instances);
 }
 
-// --- the place of a server
+// --- the position of a server
 
 class Place : public Factory {
  protected:

@@ -15,7 +15,7 @@ namespace {
 
 std::string generalInstanceID() { return "dnsgen1:" + getSystemName(); }
 
-// False where the broker makes no array.
+// False if the broker makes no array.
 bool setSuffixes(const CMPIBroker* broker, const CMPIInstance* instance, const std::vector<std::string>& suffixes,
                  const char* function, CMPIStatus* status) {
   return setElements(broker, instance, "DNSSuffixesToAppend", CMPI_string, suffixes, ZV_HERE_IN(function), status,
@@ -96,7 +96,7 @@ unsigned short getOneDNSGeneralSettingDataCMPIInstance(const CMPIBroker* broker,
                                                        CMPIStatus* status) {
   const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " properties=", properties,
                      " instances=", instances, " status=", status);
-  keyText(ref, "InstanceID", status);  // read and compared with nothing: there is but one instance
+  keyText(ref, "InstanceID", status);  // read but not compared: there is only one instance
   addInstance(broker, ref, properties, instances, status);
   flow.exit();
   return 0;

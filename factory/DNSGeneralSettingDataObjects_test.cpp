@@ -30,7 +30,7 @@ class DNSGeneralSettingDataObjectsTest : public ::testing::Test {
  protected:
   DNSGeneralSettingDataObjectsTest() { world_->host("myhost").nic("eth0", usualNic()).install(); }
 
-  // A host without anything in the place of the one with a usual interface.
+  // An empty host instead of the one with a usual interface.
   World& newWorld() {
     world_.reset();
     world_ = std::make_unique<World>();

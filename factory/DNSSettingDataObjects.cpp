@@ -48,7 +48,7 @@ void setPlainProperties(const CMPIInstance* instance, const WantedProperties& wa
                      &DNSSettingData::getRegisterThisConnectionsAddress);
 }
 
-// False where the broker makes no array.
+// False if the broker makes no array.
 bool setServerAddresses(const CMPIBroker* broker, const CMPIInstance* instance, DNSSettingData& data,
                         const char* function, CMPIStatus* status) {
   std::vector<std::string> addresses;
@@ -60,7 +60,7 @@ bool setServerAddresses(const CMPIBroker* broker, const CMPIInstance* instance, 
                      });
 }
 
-// False where the broker makes no array.
+// False if the broker makes no array.
 bool setDHCPOptions(const CMPIBroker* broker, const CMPIInstance* instance, DNSSettingData& data, const char* function,
                     CMPIStatus* status) {
   std::vector<unsigned short> options;
@@ -97,7 +97,8 @@ unsigned short getOneDNSSettingDataCMPIInstance(const CMPIBroker* broker, const 
   const std::string key = keyText(ref, "InstanceID", status);
   for (DNSSettingData data; data; ++data) {
     std::string instanceID;
-    data.getInstanceID(instanceID);  // of an interface without a name it stays empty, and an empty key finds it
+    data.getInstanceID(
+        instanceID);  // it stays empty for an interface without a name; an empty key finds such an interface
     if (instanceID != key) continue;
     *instance = makeDNSSettingDataInstance(broker, ref, data, properties, false, status);
     return 0;

@@ -9,16 +9,15 @@
 
 namespace ZV {
 
-// Results other than 0 mean failure; no function here sets a code in the status, which is handed to the broker's calls
-// and must not be null. ref gives the namespace of every path. Objects belong to the broker.
+// A result other than 0 means failure. No function here sets a code in the status, which is passed to the broker's
+// calls and must not be null. ref gives the namespace of every path. Objects belong to the broker.
 
-// 1: a path could not be made; those before it are in paths. An interface without a name gives a path without a key.
+// 1: a path could not be made; the earlier ones are in paths. An interface without a name gives a path without a key.
 unsigned short getAllDNSSettingDataCMPIObjectPaths(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                                    std::vector<CMPIObjectPath*>* paths, CMPIStatus* status);
 
-// An instance of the interface that data stands on, with its key and the properties that the list names: without a list
-// all of them, or none where isObjPath asks for the key alone. Null, or an instance without a handle, where none could
-// be made.
+// An instance for the interface of data, with its key and the properties on the list. Without a list: all of them, or
+// none if isObjPath requests only the key. Null, or an instance without a handle, if none could be made.
 CMPIInstance* makeDNSSettingDataInstance(const CMPIBroker* broker, const CMPIObjectPath* ref, DNSSettingData data,
                                          const char** properties, bool isObjPath, CMPIStatus* status);
 

@@ -30,7 +30,7 @@ class DNSSettingDataObjectsTest : public ::testing::Test {
  protected:
   DNSSettingDataObjectsTest() { world_->nic("eth0", usualNic()).install(); }
 
-  // A host without anything in the place of the one with a usual interface.
+  // An empty host instead of the one with a usual interface.
   World& newWorld() {
     world_.reset();
     world_ = std::make_unique<World>();
@@ -46,7 +46,7 @@ class DNSSettingDataObjectsTest : public ::testing::Test {
   Instance made(PropertyList properties = nullptr, bool isObjPath = false) {
     return RecordingBroker::read(make(std::move(properties), isObjPath));
   }
-  // The place among all calls of the n-th call of a slot, as failAt counts.
+  // The number among all calls of the n-th call of a slot, as failAt counts.
   std::size_t placeOf(std::string_view name, std::size_t n) const {
     const Calls calls = broker_.calls();
     for (std::size_t i = 0; i < calls.size(); ++i) {

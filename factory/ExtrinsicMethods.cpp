@@ -1,5 +1,5 @@
-// The factory's share in the endpoint's extrinsic methods. Each works on a copy of the endpoint's record and drops it:
-// changes to the host go through the modification of instances.
+// The factory's functions for the endpoint's extrinsic methods. Each works on a copy of the endpoint's record and drops
+// it: the host is changed only by modifying instances.
 #include "factory/CmpiSupport.h"
 #include "factory/DNSClientObjFactory.h"
 #include "trace/Trace.h"
@@ -8,7 +8,7 @@ namespace ZV {
 
 bool DNSClientObjFactory::copyOfNamedClient(const CMPIObjectPath* ref, DNSClient& client, CMPIStatus* rc) const {
   const CMPIString* name = stringOf(getKey(ref, "Name", rc));
-  if (!isGood(name)) return true;  // a call without a name is answered on an empty record
+  if (!isGood(name)) return true;  // a call without a name uses an empty record
   const auto found = dnsClientMap.find(textOf(name, rc));
   if (found == dnsClientMap.end()) return false;
   client = found->second;
@@ -17,7 +17,7 @@ bool DNSClientObjFactory::copyOfNamedClient(const CMPIObjectPath* ref, DNSClient
 
 namespace {
 
-// The texts of an array argument. A missing array is an empty one; an element without text is left out.
+// The texts of an array argument. A missing array counts as empty; an element without text is left out.
 std::vector<std::string> textsOf(const CMPIData& data, CMPIStatus* rc) {
   std::vector<std::string> texts;
   const CMPIArray* array = arrayOf(data);
@@ -76,7 +76,7 @@ unsigned int DNSClientObjFactory::setDNSServerSearchOrder(const CMPIBroker* brok
   const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " _broker=", broker, " ref=", ref, " serverAddrs=", &serverAddrs,
                      " ctx=", ctx);
   DNSClient client;
-  if (!copyOfNamedClient(ref, client, rc)) return 1;  // the one of the three that says nothing here
+  if (!copyOfNamedClient(ref, client, rc)) return 1;  // only here without a log line
   unsigned int value = 0;
   if (client.setDNSServerSearchOrder(textsOf(serverAddrs, rc)) != 0) {
     logError(loggerDNSObjFactory, ZV_HERE, "setDNSServerSearchOrder function failed");

@@ -22,13 +22,13 @@ bool holdsText(const CMPIData& data) {
   return isGood(stringOf(data)) || (data.type == CMPI_chars && data.value.chars != nullptr);
 }
 
-// Whether a property of the instance has a value. Here, and nowhere else, the state counts: a client sends null.
+// Whether a property of the instance has a value. Only here the state counts, because a client may send null.
 bool isGiven(const CMPIData& data) { return (data.state & (CMPI_nullValue | CMPI_notFound)) == 0; }
 
-// Forgets the code of an earlier call: some brokers write none where a call succeeds.
+// Clears the code of an earlier call: some brokers do not write one when a call succeeds.
 void expectSuccess(CMPIStatus* status) { *status = kStatusOk; }
 
-// False, with the code in the status, where the broker fails to give the text.
+// False, with the code in the status, if the broker fails to return the text.
 bool readText(const CMPIData& data, std::string& text, CMPIStatus* status) {
   if (data.type == CMPI_string) expectSuccess(status);
   std::string read = textOf(data, status);
@@ -37,7 +37,7 @@ bool readText(const CMPIData& data, std::string& text, CMPIStatus* status) {
   return true;
 }
 
-// The texts of a list's elements; one whose reading leaves a failing code in the status, or that has no text, is left
+// The texts of a list's elements. An element without text, or one that leaves a failing code in the status, is left
 // out.
 std::vector<std::string> elementTexts(const CMPIArray* array, CMPIStatus* status) {
   std::vector<std::string> texts;
@@ -52,7 +52,7 @@ std::vector<std::string> elementTexts(const CMPIArray* array, CMPIStatus* status
   return texts;
 }
 
-// The text of a property that has one; false, and text as it was, where it is null or cannot be read.
+// The text of a property; false, with text unchanged, if it is null or cannot be read.
 bool takeText(const CMPIData& property, std::string& text, CMPIStatus* status) {
   return isGiven(property) && holdsText(property) && readText(property, text, status);
 }
@@ -65,7 +65,7 @@ bool takeList(const CMPIData& property, std::vector<std::string>& texts, CMPISta
   return true;
 }
 
-// The form of a list in an interface's file: one blank behind every element.
+// The format of a list in an interface's file: one blank after every element.
 std::string listText(const std::vector<std::string>& elements) {
   std::string text;
   for (const std::string& element : elements) text += element + " ";
@@ -80,8 +80,8 @@ bool isMissing(const CMPIInstance* instance, const LogSite& site) {
   return true;
 }
 
-// A property of the instance as the modification of the setting data sees it: one that the broker fails to give does
-// not count.
+// A property of the instance for the modification of the setting data. A property that the broker fails to return is
+// ignored.
 CMPIData givenProperty(const CMPIInstance* instance, const char* name, CMPIStatus* status) {
   expectSuccess(status);
   CMPIData data = getProperty(instance, name, status);
@@ -89,7 +89,7 @@ CMPIData givenProperty(const CMPIInstance* instance, const char* name, CMPIStatu
   return data;
 }
 
-// The interface's file of the setting data with that InstanceID; false where there is none.
+// The interface's file of the setting data with that InstanceID; false if there is none.
 bool findFile(const std::string& instanceID, std::string& fileName) {
   for (DNSSettingData data; data; ++data) {
     std::string candidate;
@@ -101,7 +101,7 @@ bool findFile(const std::string& instanceID, std::string& fileName) {
   return false;
 }
 
-// An instance without a name empties the key; a name that the broker fails to give leaves it as it is.
+// An instance without a name empties the key; if the broker fails to return the name, the key is not changed.
 bool modifyConfigurationName(const std::string& fileName, const CMPIInstance* instance, CMPIStatus* status) {
   const CMPIData property = givenProperty(instance, "ConfigurationName", status);
   std::string name;
@@ -130,7 +130,7 @@ unsigned int modifyDNSSettingDataCMPIInstance(const CMPIBroker* broker, const CM
   }
   std::string domainName;
   if (takeText(givenProperty(instance, "DomainName", status), domainName, status)) {
-    if (!isValid(domainName)) return CMPI_RC_ERR_INVALID_PARAMETER;  // the host name stays rewritten
+    if (!isValid(domainName)) return CMPI_RC_ERR_INVALID_PARAMETER;  // the host name is written already
     modifyDNSValue(fileName, "DOMAINNAME", domainName);
   }
   std::vector<std::string> addresses;
@@ -152,7 +152,7 @@ unsigned int modifyDNSGeneralSettingDataCMPIInstance(const CMPIBroker* broker, c
                      " instance=", instance, " status=", status);
   if (isMissing(instance, ZV_HERE)) return CMPI_RC_ERR_FAILED;
 
-  keyText(ref, "InstanceID", status);  // read and compared with nothing: there is but one instance
+  keyText(ref, "InstanceID", status);  // read but not compared: there is only one instance
   DNSGeneralSettingData data;
   bool done = false;
   if (data) {
@@ -213,7 +213,7 @@ unsigned int modifyDNSProtocolEndpointCMPIInstance(const CMPIBroker* broker, con
       std::string name;
       if (!node.getProperty(NodeLexicon::PROP_NAME, name)) continue;
       logVariable(loggerDNSObjFactory, ZV_HERE, "name", name);
-      if (name == nameKey) modifyNode(node, instance, ZV_HERE, status);  // of one name all nodes are changed
+      if (name == nameKey) modifyNode(node, instance, ZV_HERE, status);  // all nodes with that name are changed
     }
   } catch (const std::exception&) {
     logError(loggerDNSObjFactory, ZV_HERE, "Caught Exception : ");
