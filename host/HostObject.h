@@ -1,4 +1,4 @@
-// An object of the host as the companion providers publish it: a class name and properties in order, the keys first.
+// An object of the host for the companion providers: a class name and properties in order, the keys first.
 #pragma once
 
 #include <cstdint>
@@ -18,7 +18,7 @@ struct HostProperty {
 
 struct HostObject {
   const char* className;
-  std::vector<HostProperty> keys;        // texts all of them
+  std::vector<HostProperty> keys;        // all of them texts
   std::vector<HostProperty> properties;  // without the keys
 };
 

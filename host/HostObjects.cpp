@@ -38,7 +38,7 @@ constexpr std::uint16_t kManagementController = 28;
 constexpr std::uint16_t kIPv4 = 4096;
 constexpr std::uint16_t kIPv6 = 4097;
 
-// The first line of a small file; empty where it cannot be read.
+// The first line of a small file; empty if it cannot be read.
 std::string firstLine(const char* path) {
   std::ifstream file(path);
   std::string line;
@@ -47,10 +47,10 @@ std::string firstLine(const char* path) {
   return end == std::string::npos ? "" : line.substr(0, end + 1);
 }
 
-// A name for this machine that is the same at every start and tells nothing of the machine's id, which must not leave
-// the host; empty where the machine has no id.
+// A name for this machine that is the same at every start and does not reveal the machine's id, which must not leave
+// the host; empty if the machine has no id.
 std::string machineName() {
-  // Without SD_ID128_MAKE, which is no C++.
+  // SD_ID128_MAKE is not valid C++.
   constexpr sd_id128_t kApplication = {
       {0x5c, 0x3b, 0x0e, 0x8d, 0x2a, 0x94, 0x4f, 0x61, 0x9d, 0x77, 0x1b, 0xc8, 0x40, 0xe6, 0x52, 0x9f}};
   sd_id128_t id;
@@ -94,14 +94,14 @@ HostObject serviceProcessor() {
            {"Dedicated", std::vector<std::uint16_t>{kManagementController}}}};
 }
 
-// One interface of the tree and where it belongs.
+// One interface of the tree and its owning system.
 struct Interface {
   const Node& config;
   std::string name;
   bool onServiceProcessor;
 };
 
-// Every interface in tree order. What has no name is known by that of its port.
+// Every interface in tree order. An interface without a name gets the name of its port.
 std::vector<Interface> interfaces(const TreeSnapshot& tree) {
   std::vector<Interface> found;
   for (const Node* node = tree.nextOfType(NodeType::NetworkIPConfig, 0); node != nullptr;
@@ -189,7 +189,7 @@ std::vector<HostObject> computerSystems(const TreeSnapshot& tree) {
   for (const Node& node : tree.nodes()) {
     if (!node.isServiceProcessor()) continue;
     objects.push_back(serviceProcessor());
-    break;  // several would share one name
+    break;  // otherwise several would share one name
   }
   return objects;
 }
@@ -200,7 +200,7 @@ std::vector<HostObject> ipEndpoints(const TreeSnapshot& tree) {
   for (const Interface& interface : all) names.insert(interface.name);
 
   std::vector<HostObject> objects;
-  std::set<std::string> begun;  // interfaces whose first address has the plain name
+  std::set<std::string> begun;  // interfaces whose first address already has the plain name
   for (const Interface& interface : all) {
     unsigned int ordinal = 1;
     for (const InterfaceAddress& address : interface.config.addresses()) {
@@ -223,7 +223,7 @@ std::vector<HostObject> ipAssignments(const TreeSnapshot& tree) {
     const std::string prefix = (interface.onServiceProcessor ? "BMC%" : "Computer%") + interface.name;
     for (const InterfaceAddress& address : interface.config.addresses()) {
       const std::string instanceID = prefix + (address.family() == AddressFamily::IPv4 ? "%ipv4" : "%ipv6");
-      // The first address of each version tells the origin.
+      // The first address of each version determines the origin.
       if (known.insert(instanceID).second) objects.push_back(ipAssignment(instanceID, interface, address));
     }
   }

@@ -1,4 +1,4 @@
-// The companion providers: the classes that the DNS associations point at and that a bare CIM server lacks.
+// The companion providers: the classes that the DNS associations refer to and that a bare CIM server lacks.
 #include <cmpidt.h>
 #include <cmpift.h>
 
@@ -9,7 +9,7 @@ namespace zorva::host {
 
 namespace {
 
-// One provider: what it publishes, with a broker and a table of its own.
+// One provider: its objects, with its own broker and table.
 template <Publish publish>
 struct Provider {
   static inline const CMPIBroker* broker = nullptr;

@@ -142,7 +142,7 @@ bool hasKeysOf(const HostObject& object, const CMPIObjectPath* ref) {
   return true;
 }
 
-// The objects of one class, each handed to the function until that gives a failure or says to stop.
+// Calls the function with each object of one class, until it returns a failure or says to stop.
 template <typename Handle>
 CMPIStatus forEachObject(const CMPIBroker* broker, Publish publish, const std::string& className, Handle handle) try {
   for (const HostObject& object : publish(*zorva::agent::currentTree())) {
