@@ -7,33 +7,32 @@
 
 #include "broker/Broker.h"
 
-// Success is success: providers say that a modification was done also where nothing was stored, so what was changed is
-// read again. Safe on any thread.
+// Reads an instance again after a modification: a provider may report success and store nothing. Safe on any thread.
 
 namespace zorva::frontend {
 
-/// A change that came to nothing.
+/// A change that was not stored.
 struct LostChange {
   std::string property;
   std::string reason;
 };
 
-/// Success where there are none; else CIM_ERR_FAILED with "NAME was not stored: REASON" for each.
+/// Success if there are none; else CIM_ERR_FAILED with "NAME was not stored: REASON" for each.
 broker::Status statusOf(const std::vector<LostChange>& lost);
 
-/// Why a change did not stick; `now` is the instance as it was read again.
+/// Why a change was not stored; `now` is the instance as it was read again.
 using ReasonOf = std::function<std::string(const broker::Instance& now, const broker::Property& change)>;
 
-/// statusOf those changes whose values `now` has not. Values that a setting cannot tell apart (broker::hasSameEffect)
-/// are the same here too.
+/// statusOf() the changes whose values are not in `now`. Values that a setting cannot tell apart
+/// (broker::hasSameEffect) count as equal.
 broker::Status checkChanges(const broker::Instance& now, const std::vector<broker::Property>& wanted,
                             const ReasonOf& reasonOf);
 
-/// The reason as far as this host shows it.
+/// The reason, as far as it can be found on this host.
 std::string reasonOnThisHost(const broker::Instance& now, const broker::Property& change);
 
-/// Broker::modifyInstance, then a look whether what it changed is so. A failure of the provider's own stays as it is.
-/// `changed`, where it is not null, gets the properties that it changed, none where all were as asked for.
+/// Broker::modifyInstance, then a check that the changes were stored. A failure of the provider itself is returned
+/// unchanged. `changed`, if not null, gets the changed properties; none if all had the requested values already.
 broker::Status modifyInstance(broker::Broker& broker, const broker::Instance& instance,
                               const std::optional<std::vector<std::string>>& propertyList,
                               const broker::Caller& caller = {}, std::vector<broker::Property>* changed = nullptr);

@@ -39,7 +39,7 @@ bool exists(const std::string& path) {
   return ::stat(path.c_str(), &status) == 0;
 }
 
-/// Why nothing can be written at `path`, which is there.
+/// Why the existing file `path` cannot be written.
 std::optional<std::string> writingProblem(const std::string& path) {
   if (::faccessat(AT_FDCWD, path.c_str(), W_OK, AT_EACCESS) != 0) {
     return path + " cannot be written: " + std::strerror(errno);
@@ -73,7 +73,7 @@ std::optional<std::string> lineProblem(const std::string& interface, std::string
   const zorva::agent::FileText file = zorva::agent::readFile(path, kLargestFile);
   if (file.error != 0) return path + ": " + zorva::agent::fileErrorText(file.error);
   if (file.truncated) return path + " is larger than 16 MiB";
-  // A disk that is full may have cost the line.
+  // If the disk is full, the line may be missing for that reason.
   if (auto problem = writingProblem(path)) return problem;
   // The providers look for the key anywhere in a line.
   if (file.text.find(key) != std::string::npos) return std::nullopt;

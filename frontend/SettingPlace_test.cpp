@@ -28,7 +28,7 @@ constexpr const char* kTree = R"({"system_name": "host1", "nodes": [
     {"type": "Port", "name": "p1", "description": "", "children": [
       {"type": "NetworkIPConfig", "name": "ip", "description": "", "properties": {"name": "eth0"}}]}]}]})";
 
-/// A host with the interface eth0 and the service processor's mgmt0; its data directory is there.
+/// A host with the interface eth0 and the service processor's mgmt0; its data directory exists.
 class SettingPlaceTest : public ::testing::Test {
  protected:
   SettingPlaceTest() {
@@ -45,7 +45,7 @@ class SettingPlaceTest : public ::testing::Test {
     return made;
   }
 
-  /// The reason for a property of eth0's settings; empty where there is none.
+  /// The reason for a property of eth0's settings; empty if there is none.
   static std::string reason(const std::string& property) {
     return missingPlace(instance("ZORVA_DNSSettingData", "Computer%eth0"), property).value_or("");
   }
@@ -92,7 +92,7 @@ TEST_F(SettingPlaceTest, NeedsTheDataDirectory) {
 }
 
 TEST_F(SettingPlaceTest, NeedsRoomOnTheDisk) {
-  // In a child, with a disk of its own at the data directory, which goes with it.
+  // In a child process, with a separate disk mounted at the data directory, which is unmounted when the child ends.
   const pid_t child = fork();
   if (child == 0) {
     if (unshare(CLONE_NEWNS) != 0 || mount(nullptr, "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0 ||

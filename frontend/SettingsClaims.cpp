@@ -13,7 +13,7 @@ namespace {
 
 using broker::Access;
 
-// The classes whose providers read interface files: the settings, and the associations that walk them.
+// The classes whose providers read interface files: the settings, and the associations that read them.
 constexpr const char* kReadsFiles[] = {kSettingClass,
                                        kGeneralSettingClass,
                                        "ZORVA_DNSGeneralElementSettingData",
@@ -32,7 +32,7 @@ bool needsClaim(Access access, std::string_view className) {
   return isNamed(className, std::begin(kChanges), std::end(kChanges));
 }
 
-/// Empty where the change goes to no file.
+/// Empty if the change does not write to a file.
 std::string interfaceOfFile(const broker::ObjectPath& changed) {
   if (schema::sameName(changed.className, kGeneralSettingClass)) {
     return interfaceOfHostSettings(*zorva::agent::currentTree()).value_or("");
@@ -66,7 +66,7 @@ class LockClaim : public broker::Claim {
 }  // namespace
 
 struct SettingsClaims::State {
-  LockPointer held;  // of a program that has taken the lock itself
+  LockPointer held;  // of a program that holds the lock itself
 };
 
 SettingsClaims::SettingsClaims() : state_(std::make_shared<State>()) {}

@@ -9,8 +9,8 @@
 #include "agent/tree/TreeSnapshot.h"
 #include "broker/Broker.h"
 
-// The lock of the agent's data directory around what the providers do with interface files: shared while they read
-// them, exclusive while settings are changed.
+// Holds the lock of the agent's data directory while providers use interface files: shared while they read them,
+// exclusive while they change settings.
 
 namespace zorva::frontend {
 
@@ -25,11 +25,11 @@ class SettingsClaims {
   SettingsClaims();
 
   /// For BrokerOptions::claim. Takes the lock for each request of a class whose provider reads or changes interface
-  /// files, or changes an endpoint. Thread-safe where nobody uses Hold; it may outlive this.
+  /// files, or changes an endpoint. Thread-safe while no Hold is in use; it may outlive this object.
   broker::ClaimHook hook() const;
 
-  /// The lock for a program that reads, decides and then changes; its requests do without one of their own meanwhile.
-  /// For a program of one thread. One within another does nothing. Throws as zorva::agent::SettingsLock does.
+  /// The lock for a program that reads, decides and then changes; meanwhile its requests take no lock of their own. For
+  /// a program with one thread. A nested Hold does nothing. Throws as zorva::agent::SettingsLock does.
   class Hold {
    public:
     explicit Hold(const SettingsClaims& claims);
@@ -38,18 +38,18 @@ class SettingsClaims {
     Hold& operator=(const Hold&) = delete;
 
    private:
-    std::shared_ptr<State> state_;  // null: within another
+    std::shared_ptr<State> state_;  // null: nested
   };
 
  private:
   std::shared_ptr<State> state_;
 };
 
-/// The interface that an InstanceID of the settings of an interface names: what follows the first "%".
+/// The interface in an InstanceID of an interface's settings: the text after the first "%".
 std::string interfaceOfId(std::string_view instanceId);
 
-/// The interface whose file holds the settings of the host as a whole: that of the first configuration outside a
-/// service processor. Nothing where there is none; the empty text where that one has no name.
+/// The interface whose file has the settings of the host as a whole: that of the first configuration outside a service
+/// processor. Nothing if there is none; the empty text if that one has no name.
 std::optional<std::string> interfaceOfHostSettings(const zorva::agent::TreeSnapshot& tree);
 
 }  // namespace zorva::frontend
