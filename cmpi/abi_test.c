@@ -1,5 +1,5 @@
 /* The headers as a C program sees them: sizes, offsets, types and values, every macro that calls a slot, and a provider
- * made with the CM...MIStub macros. What is not as cmpi-abi.json says does not compile. */
+ * made with the CM...MIStub macros. A difference from cmpi-abi.json does not compile. */
 
 #include <stddef.h>
 

@@ -1,5 +1,5 @@
-// Holds the headers against the facts of the standard in cmpi-abi.json, entry by entry. generate_abi_test.py turns the
-// facts into the abi_*.inc files; the counts at the end of each test keep it from passing an entry over.
+// Compares the headers with the facts of the standard in cmpi-abi.json, entry by entry. generate_abi_test.py turns the
+// facts into the abi_*.inc files; the counts at the end of each test make sure that no entry is skipped.
 //
 // Built three times: as it is, with inline functions in place of macros (and the slots of CMPI_VER_86), and for
 // version 1.0 of CMPI. CMPI_ABI_SUITE names the variant.
@@ -23,14 +23,14 @@
 #include "cmpios.h"
 #include "cmpipl.h"
 
-// What abi_test.c, the view of a C program, offers to this one.
+// The functions of abi_test.c, the view of a C program.
 extern "C" const CMPIBroker* cProviderBroker(void);
 
 namespace {
 
 #include "abi_counts.inc"
 
-// What a macro expands to, without the blanks, which compilers set differently.
+// The text of a macro's expansion without blanks, which compilers place differently.
 #define CMPI_ABI_SPELLED_(...) #__VA_ARGS__
 #define CMPI_ABI_SPELLED(...) withoutBlanks(CMPI_ABI_SPELLED_(__VA_ARGS__))
 
@@ -146,7 +146,7 @@ TEST(CMPI_ABI_SUITE, EveryConstantHasTheValueOfTheStandard) {
 
 using Words = std::vector<std::uint64_t>;
 
-// Any value that goes through a slot, as a number that can be compared.
+// Any value that passes through a slot, as a number that can be compared.
 template <class Type>
 std::uint64_t word(Type value) {
   if constexpr (std::is_pointer_v<Type>) {
@@ -162,8 +162,8 @@ std::uint64_t word(Type value) {
   }
 }
 
-// A value to pass at a position, unlike that of any other position of the same type. Pointers point into memory that
-// nobody reads.
+// A value to pass at a position, different from that of any other position of the same type. Pointers point into memory
+// that is never read.
 template <class Type>
 std::remove_cv_t<Type> argument(int position) {
   using Plain = std::remove_cv_t<Type>;
@@ -183,7 +183,7 @@ std::remove_cv_t<Type> argument(int position) {
   }
 }
 
-// The position of what slots answer.
+// The position that stands for a slot's return value.
 constexpr int kAnswer = 60;
 
 struct Call {
@@ -429,7 +429,7 @@ void checkCMIsNullObject() {
   EXPECT_EQ(CMIsNullObject(nullptr), 1);
 }
 
-// The bits lie above those of a CMPIBoolean, and must show in one all the same.
+// The bits are above those of a CMPIBoolean; the macro must show them even so.
 void checkCMIsNullValue() {
   CMPIData data{CMPI_string, CMPI_goodValue, {}};
   CMPIBoolean isNull = CMIsNullValue(data);
@@ -549,7 +549,7 @@ int sampleHooks = 0;
 
 }  // namespace
 
-// The classes behind the C++ factories, which whoever uses those brings.
+// The classes below the C++ factories, which a program that uses the factories must define.
 struct CmpiBroker {
   explicit CmpiBroker(CMPIBroker* given) : broker(given) {}
   const CMPIBroker* broker;

@@ -1,8 +1,8 @@
 /* CMPI, the Common Manageability Programming Interface (The Open Group), version 2.0: types and constants.
  *
- * CMPI_VERSION, if defined before the include, says which version of the interface the program wants: 100 or 200.
- * Without it, it is 200. Then CMPI_VER_200 and CMPI_VER_100 are defined, for 100 only CMPI_VER_100, and what came
- * with 2.0 is left out. */
+ * CMPI_VERSION, if defined before the include, is the version of the interface that the program needs: 100 or 200.
+ * Without it, it is 200. Then CMPI_VER_200 and CMPI_VER_100 are defined, for 100 only CMPI_VER_100, and the parts new
+ * in 2.0 are left out. */
 
 #ifndef _CMPIDT_H_
 #define _CMPIDT_H_
@@ -107,7 +107,7 @@ typedef double CMPIReal64;             /* IEEE 754 double */
 /* Which type a value has: one of the constants below. */
 typedef unsigned short CMPIType;
 
-/* Types of values. Bits of a kind can be tested: type & CMPI_ENC tells pointers, type & CMPI_ARRAY arrays. */
+/* Types of values. Bits of a kind can be tested: type & CMPI_ENC means a pointer, type & CMPI_ARRAY an array. */
 #define CMPI_null 0                          /* No type, as that of a missing value */
 #define CMPI_SIMPLE (2)                      /* Bit of the simple types */
 #define CMPI_boolean (2 + 0)                 /* Truth value */
@@ -172,7 +172,7 @@ typedef unsigned short CMPIType;
 #define CMPI_keyBoolean (CMPI_boolean) /* Truth-value key */
 #define CMPI_keyRef (CMPI_ref)         /* Reference key */
 
-/* What the text of a predicate's operand stands for. */
+/* The meaning of the text of a predicate's operand. */
 #define CMPI_charString (CMPI_string)                                /* Any text */
 #define CMPI_integerString (CMPI_string | CMPI_sint64)               /* An integer */
 #define CMPI_realString (CMPI_string | CMPI_real64)                  /* A floating-point number */
@@ -215,7 +215,7 @@ struct _CMPIValuePtr {
 
 typedef struct _CMPIValuePtr CMPIValuePtr;
 
-/* A value; which member holds is told by a CMPIType beside it. */
+/* A value; a CMPIType beside it says which member is valid. */
 union _CMPIValue {
   CMPIUint64 uint64;      /* CMPI_uint64 */
   CMPIUint32 uint32;      /* CMPI_uint32 */
@@ -249,7 +249,7 @@ union _CMPIValue {
 
 typedef union _CMPIValue CMPIValue;
 
-/* A value with its type and state. Objects in it belong to whoever gave it out. */
+/* A value with its type and state. Objects in it belong to the function that returned it. */
 struct _CMPIData {
   CMPIType type; /* Which member of value holds. */
   /* CMPI_goodValue, or the bits of what is special about it. With CMPI_nullValue, value means nothing. */
@@ -277,7 +277,7 @@ typedef unsigned int CMPIFlags;
 #define CMPIInitNameSpace \
   "CMPIInitNameSpace"       /* CMPI_string: namespace that the provider was registered for, at its creation */
 #define CMPIRole "CMPIRole" /* CMPI_string: role of the caller */
-#define CMPIAcceptLanguage "CMPIAcceptLanguage"   /* CMPI_string: languages that the caller wants (RFC 2616, 14.4) */
+#define CMPIAcceptLanguage "CMPIAcceptLanguage"   /* CMPI_string: languages that the caller prefers (RFC 2616, 14.4) */
 #define CMPIContentLanguage "CMPIContentLanguage" /* CMPI_string: language of the request's or the answer's texts */
 
 /* What a broker can do: bits of CMPIBrokerFT.brokerCapabilities. */

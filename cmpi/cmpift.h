@@ -52,7 +52,7 @@ struct _CMPIBrokerEncFT {
   /* A new instance of the class and namespace of op. It starts with the key values that op holds. CMPI_RC_ERR_NOT_FOUND
    * if the broker does not know the class, CMPI_RC_ERR_FAILED otherwise. */
   CMPIInstance* (*newInstance)(const CMPIBroker* mb, const CMPIObjectPath* op, CMPIStatus* rc);
-  /* A new object path of namespace ns and class cn without keys. A null ns stands for the namespace that the broker
+  /* A new object path of namespace ns and class cn without keys. A null ns means the namespace that the broker
    * presumes. CMPI_RC_ERR_FAILED if it cannot be made. */
   CMPIObjectPath* (*newObjectPath)(const CMPIBroker* mb, const char* ns, const char* cn, CMPIStatus* rc);
   /* A new, empty list of method arguments. */
@@ -101,7 +101,7 @@ struct _CMPIBrokerEncFT {
                       const CMPIString* string);
 #ifdef CMPI_VER_200
   /* A new error object (CIM_Error): the entity that owns the message, its id and text, severity, cause, and the status
-   * code that goes with it. Everything else can be set afterwards. */
+   * code of the error. Everything else can be set afterwards. */
   CMPIError* (*newCMPIError)(const CMPIBroker* mb, const char* owner, const char* msgID, const char* msg,
                              const CMPIErrorSeverity sev, const CMPIErrorProbableCause pc, const CMPIrc cimStatusCode,
                              CMPIStatus* rc);
@@ -131,7 +131,7 @@ struct _CMPIBrokerFT {
   CMPIStatus (*attachThread)(const CMPIBroker* mb, const CMPIContext* ctx);
   /* Called in the attached thread as its last use of the broker; frees ctx and what the thread was given. */
   CMPIStatus (*detachThread)(const CMPIBroker* mb, const CMPIContext* ctx);
-  /* Hands the indication ind of namespace ns to the broker for delivery to whoever subscribed. ind stays the caller's.
+  /* Hands the indication ind of namespace ns to the broker for delivery to the subscribers. ind stays the caller's.
    * CMPI_RC_ERR_NOT_SUPPORTED if the broker has no indications. */
   CMPIStatus (*deliverIndication)(const CMPIBroker* mb, const CMPIContext* ctx, const char* ns,
                                   const CMPIInstance* ind);
@@ -383,13 +383,13 @@ struct _CMPIErrorFT {
   CMPIString* (*getProbableCauseDescription)(const CMPIError* er, CMPIStatus* rc);
   /* What can be done about it, an array of strings. */
   CMPIArray* (*getRecommendedActions)(const CMPIError* er, CMPIStatus* rc);
-  /* Where it arose: the path of the object, in the form that getErrorSourceFormat tells. */
+  /* Where it arose: the path of the object, in the form that getErrorSourceFormat gives. */
   CMPIString* (*getErrorSource)(const CMPIError* er, CMPIStatus* rc);
   /* The form of getErrorSource's text. */
   CMPIErrorSrcFormat (*getErrorSourceFormat)(const CMPIError* er, CMPIStatus* rc);
   /* That form in words, where getErrorSourceFormat gives CMPIErrSrcOther. */
   CMPIString* (*getOtherErrorSourceFormat)(const CMPIError* er, CMPIStatus* rc);
-  /* The status code that goes with the error. */
+  /* The status code of the error. */
   CMPIrc (*getCIMStatusCode)(const CMPIError* er, CMPIStatus* rc);
   /* That status code in words. */
   CMPIString* (*getCIMStatusCodeDescription)(const CMPIError* er, CMPIStatus* rc);
@@ -397,7 +397,7 @@ struct _CMPIErrorFT {
   CMPIArray* (*getMessageArguments)(const CMPIError* er, CMPIStatus* rc);
   /* Sets the kind of error. */
   CMPIStatus (*setErrorType)(CMPIError* er, const CMPIErrorType errorType);
-  /* Sets the kind in words; it goes with OtherErrorType. */
+  /* Sets the kind in words, for the kind OtherErrorType. */
   CMPIStatus (*setOtherErrorType)(CMPIError* er, const char* errorType);
   /* Sets the cause in words. */
   CMPIStatus (*setProbableCauseDescription)(CMPIError* er, const char* description);
@@ -407,7 +407,7 @@ struct _CMPIErrorFT {
   CMPIStatus (*setErrorSource)(CMPIError* er, const char* source);
   /* Sets the form of the text given to setErrorSource. */
   CMPIStatus (*setErrorSourceFormat)(CMPIError* er, const CMPIErrorSrcFormat format);
-  /* Sets that form in words; it goes with CMPIErrSrcOther. */
+  /* Sets that form in words, for the form CMPIErrSrcOther. */
   CMPIStatus (*setOtherErrorSourceFormat)(CMPIError* er, const char* format);
   /* Sets the status code in words. */
   CMPIStatus (*setCIMStatusCodeDescription)(CMPIError* er, const char* description);

@@ -2,7 +2,7 @@
  * function tables, and for making a provider.
  *
  * CM...: objects; CB...: up-calls to the broker; CD...: about any object. They take no step of their own beyond the
- * call: what the slot does, its errors and who owns the result is told in cmpift.h. As macros they use their first
+ * call: cmpift.h describes what the slot does, its errors and the owner of the result. As macros they use their first
  * argument twice. With CMPI_INLINE defined before the include, those that call a slot are inline functions of the same
  * names instead. */
 
@@ -47,7 +47,7 @@ static inline void CMSetStatus(CMPIStatus* st, CMPIrc rcp) {
   if (st) *st = cmpi_status_(rcp, NULL);
 }
 
-/* Sets *st to the code rcp and the message string, which stays the property of who owned it; does nothing where st is
+/* Sets *st to the code rcp and the message string, which keeps its owner; does nothing where st is
  * null. */
 static inline void CMSetStatusWithString(CMPIStatus* st, CMPIrc rcp, const CMPIString* string) {
   if (!st) return;
@@ -361,7 +361,7 @@ static inline CMPIBoolean CMIsNullObject(const void* o) {
 /* Form of the source's text in words. */
 #define CMGetOtherErrorSourceFormat(e, rc) ((e)->ft->getOtherErrorSourceFormat((e), (rc)))
 
-/* Status code that goes with the error. */
+/* Status code of the error. */
 #define CMGetCIMStatusCode(e, rc) ((e)->ft->getCIMStatusCode((e), (rc)))
 
 /* That status code in words. */
@@ -1150,7 +1150,7 @@ static inline CMPIData CBGetProperty(const CMPIBroker* mb, const CMPIContext* ct
   };                                             \
   CMPI_ENTRY_POINT_(CMPIPropertyMI, pn##_Create_PropertyMI, pn##_PropertyMIFT_, broker, hook)
 
-/* The last two slots of an indication provider's table: null, or with CMPI_VER_86 defined by who includes this header
+/* The last two slots of an indication provider's table: null, or with CMPI_VER_86 defined before the include
  * pfxEnableIndications and pfxDisableIndications. */
 #ifdef CMPI_VER_86
 #define CMIndicationMIStubExtensions(pfx) pfx##EnableIndications, pfx##DisableIndications,
@@ -1177,8 +1177,8 @@ static inline CMPIData CBGetProperty(const CMPIBroker* mb, const CMPIContext* ct
  *
  * Each CM...MIFactory writes the table and the entry point for the class cn under the provider name pn; CMProviderBase
  * writes, once for each pn, the object that the entry points of one provider share. CMPI does not define the classes
- * behind these macros: who uses them brings CmpiBroker, CmpiContext, CmpiProviderBase, CmpiBaseMI and
- * Cmpi<Instance, Association, Method, Property, Indication>MI; README.md beside this header tells what they must have.
+ * of these macros: a program that uses them defines CmpiBroker, CmpiContext, CmpiProviderBase, CmpiBaseMI and
+ * Cmpi<Instance, Association, Method, Property, Indication>MI; README.md beside this header says what they must have.
  * Used at file scope, without a semicolon. */
 
 /* The state that the entry points of the provider pn share. */

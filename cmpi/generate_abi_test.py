@@ -11,14 +11,14 @@ import pathlib
 import re
 import sys
 
-# Macros, told by their name and number of parameters, whose conditions no version that the headers offer can meet and
-# whose slots were gone before version 1.0.
+# Macros by name and number of parameters. Their conditions are true in no version that the headers offer, and their
+# slots were removed before version 1.0.
 WITHDRAWN = {
     ("CMEvaluatePredicate", 4),
     ("CBSetInstance", 5),
 }
 
-# Type names in CMFmt... that no CMPI header defines, and what they stand for.
+# Type names in CMFmt... that no CMPI header defines, and their meaning.
 TYPE_MENDS = {"CMPI_String": "CMPI_string", "CMPI_String*": "CMPIString*"}
 
 
@@ -29,7 +29,7 @@ class Facts:
         # Version 1.0 lacks these whole types.
         types = self.data["records"] + self.data["enums"]
         self.only_200 = {entry["name"] for entry in types if not entry["in_100"]}
-        # A macro that names a slot its table lacks means the one that version 2.1 names for it.
+        # A macro that names a slot which its table lacks means the slot that version 2.1 names for it.
         self.slot_mends = {
             (defect["table"], defect["slot"]): defect["in_2_1"]["slot"]
             for defect in self.data["published_defects"]
@@ -99,7 +99,7 @@ def enums(facts):
 
 
 def constants(facts):
-    """The constants that have a value here; preprocessor_test.py sees to the others."""
+    """The constants that have a value here; preprocessor_test.py tests the others."""
     out = []
     for constant in facts.data["constants"]:
         name = constant["name"]

@@ -1,5 +1,5 @@
 #!/usr/bin/env python3
-"""Holds the headers against cmpi-abi.json in what one translation unit cannot show: other platforms, other versions of
+"""Compares the headers with cmpi-abi.json where one translation unit is not enough: other platforms, other versions of
 CMPI, C beside C++, and each header included alone.
 
 usage: preprocessor_test.py --c COMPILER --cxx COMPILER [unittest options]
@@ -22,10 +22,10 @@ HEADERS = list(FACTS["headers"])
 STRICT = ["-Wall", "-Wextra", "-Wpedantic", "-Wconversion", "-Wshadow", "-Werror"]
 COMPILERS = {}
 
-# The headers choose these by CMPI_VERSION; the tests of the version see to them.
+# The headers choose these by CMPI_VERSION; the tests of the version check them.
 VERSION_NAMES = {"CMPI_VER_100", "CMPI_VER_200", "CMPICurrentVersion"}
 
-# Where the published text is empty and these headers name the slots that stay empty with it.
+# The published text is empty there; these headers name the slots that stay empty with it.
 TEXT_MENDS = {("CMIndicationMIFactoryExtensions", ""): "NULL,NULL,"}
 
 
