@@ -1,5 +1,5 @@
 #!/usr/bin/env python3
-"""Measures and holds each figure against its target.
+"""Measures, and compares each figure with its target.
 
   bench/compare.py --build build/bench [NAME...]
 
@@ -39,8 +39,8 @@ AGENT = [
            "EntryLineHalf", "BoundedPrintOfEntry"),
 ]
 
-# By the number of objects: the associations of each class at N interfaces of one address with two servers, and the
-# pairs that the provider looks at where it compares both ends.
+# By the number of objects: the associations of each class with N interfaces that have one address and two servers; and
+# the pairs that the provider compares if it reads both ends.
 ASSOCIATIONS = {
     "RemoteAccessAvailableToElement": lambda n: 2 * n,
     "DNSSAPSAPDependency": lambda n: n,

@@ -1,4 +1,4 @@
-// What the providers cost by the number of objects, through the broker, as a client of zorvactl pays for it.
+// The cost of the providers by the number of objects, through the broker, as a client of zorvactl sees it.
 #include <benchmark/benchmark.h>
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -18,7 +18,7 @@ namespace {
 
 namespace fs = std::filesystem;
 
-// A directory of this process with a configuration and a tree of interfaces; the agent reads it from then on.
+// A directory of this process with a configuration and a tree of interfaces, which the agent reads from then on.
 class BenchHost {
  public:
   BenchHost() {
@@ -33,7 +33,7 @@ class BenchHost {
 
   fs::path dataFile(int interface) const { return directory_ / "data" / ("ifcfg-eth" + std::to_string(interface)); }
 
-  // Each interface has one address and one suffix; the servers stand at every interface.
+  // Each interface has one address and one suffix; all interfaces have the same servers.
   void use(int interfaces, int servers) {
     std::ofstream tree(directory_ / "tree.json");
     tree << R"({"system_name":"host1","nodes":[{"type":"System","name":"system","description":"Computer","children":[)";
@@ -81,7 +81,7 @@ std::size_t enumerateInstances(const char* className) {
 }
 
 void run(benchmark::State& state, const char* className, std::size_t expected) {
-  enumerateInstances(className);  // reads the tree, which does not change from here on
+  enumerateInstances(className);  // reads the tree, which does not change afterwards
   for (auto _ : state) {
     if (enumerateInstances(className) != expected) state.SkipWithError("wrong number of instances");
   }
@@ -120,7 +120,7 @@ void SettingDataFromFiles(benchmark::State& state) {
 }
 BENCHMARK(SettingDataFromFiles)->Unit(benchmark::kMillisecond);
 
-// What reading four keys of each file cannot do without.
+// The least work for reading four keys of each file.
 void FourPassesOverFiles(benchmark::State& state) {
   BenchHost host;
   host.use(kFiles, 2);

@@ -1,4 +1,4 @@
-// What it costs to look at the live host, and to read it, beside the system calls that this cannot do without.
+// The cost of checking and of reading the live host, compared with the system calls that are needed for it.
 #include <arpa/inet.h>
 #include <benchmark/benchmark.h>
 #include <fcntl.h>
@@ -41,7 +41,7 @@ void PlaceCursor(benchmark::State& state) {
 }
 BENCHMARK(PlaceCursor);
 
-// One socket for the kernel's reports, one inotify each for the host's files and for the values that were set.
+// One socket for the kernel's messages, and one inotify descriptor each for the host's files and for the overlay.
 void BareReads(benchmark::State& state) {
   const Socket socket = openSocket(RTMGRP_LINK | RTMGRP_IPV4_IFADDR | RTMGRP_IPV6_IFADDR);
   const std::array<int, 2> watches{::inotify_init1(IN_NONBLOCK | IN_CLOEXEC),
@@ -58,12 +58,12 @@ BENCHMARK(BareReads);
 
 void ReadHost(benchmark::State& state) {
   zorva::agent::HostSource source;
-  source.read();  // what is opened once stays open
+  source.read();  // opens what stays open
   for (auto _ : state) benchmark::DoNotOptimize(source.read());
 }
 BENCHMARK(ReadHost);
 
-// Asks for one table and reads the answer to its end.
+// Requests one table and reads the response to its end.
 void dump(const Socket& socket, unsigned short type, unsigned int sequence, std::array<char, 32768>& buffer) {
   std::array<char, 64> room{};
   nlmsghdr* message = ::mnl_nlmsg_put_header(room.data());

@@ -1,4 +1,4 @@
-// What a line costs that nobody wants: it is put together twice and then dropped.
+// The cost of a line that is not logged: its text is made twice and then dropped.
 #include <benchmark/benchmark.h>
 
 #include <array>
@@ -14,7 +14,7 @@ const std::string category = "Zorvagent.DNSClientProvider";
 constexpr const char* kText = "getAllDNSClientCMPIObjPaths Failed";
 constexpr std::size_t kLine = 512;
 
-// Everything is dropped, as where log and trace are off.
+// All lines are dropped, as if log and trace were off.
 void dropAllLines() {
   zorva::agent::Config config;
   config.logTarget = "off";
@@ -39,7 +39,7 @@ void BoundedPrint(benchmark::State& state) {
 }
 BENCHMARK(BoundedPrint);
 
-// Six addresses as a provider has them, some on the heap and some on the stack.
+// Six addresses such as a provider has, some on the heap and some on the stack.
 struct Arguments {
   int onStack[3] = {};
   std::string onHeap[3];

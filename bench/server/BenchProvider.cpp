@@ -1,5 +1,5 @@
-// A provider whose own work is next to nothing, so that what the server and its broker add is what is measured: each
-// instance has fifteen properties, four of them keys, of the kinds that a protocol endpoint has.
+// A provider that does almost no work itself, so that the cost of the server and its broker is measured: each instance
+// has fifteen properties, four of them keys, of the types that a protocol endpoint has.
 #include <charconv>
 #include <cstring>
 
@@ -64,7 +64,7 @@ void setNumbers(CMPIInstance* instance, int number) {
 CMPIInstance* instanceOf(const CMPIObjectPath* like, int number) {
   char name[32] = "eth";
   std::to_chars(name + 3, name + sizeof name - 1, number);
-  // The keys come with the path.
+  // The path contains the keys.
   CMPIInstance* instance = broker->eft->newInstance(broker, pathOf(like, name), nullptr);
   for (const Text& each : kTexts) {
     instance->ft->setProperty(instance, each.name, reinterpret_cast<const CMPIValue*>(each.value), CMPI_chars);

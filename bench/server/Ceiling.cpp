@@ -1,4 +1,4 @@
-// What the HTTP library can do at best: the same bytes from memory, in the threads that the server has.
+// The best that the HTTP library can do: the same bytes from memory, with as many threads as the server has.
 //
 //   ceiling FILE THREADS handover    each request goes to another thread and back, as the server has to do it, since no
 //                                    provider may hold up an event thread
@@ -24,7 +24,7 @@
 
 namespace {
 
-/// Threads that do nothing for a request but wake its connection again.
+/// Threads that only wake the connection of a request again.
 class Workers {
  public:
   explicit Workers(int count) {
