@@ -1,4 +1,4 @@
-// Any bytes as MOF. What is taken can be written down and read back to the same.
+// Any bytes as MOF. If they are accepted, the result can be written and read back unchanged.
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>

@@ -1,4 +1,4 @@
-// Any bytes as the text of an object path. What is taken can be written and read back to the same.
+// Any bytes as the text of an object path. If they are accepted, the path can be written and read back unchanged.
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>

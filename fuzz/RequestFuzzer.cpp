@@ -1,5 +1,5 @@
-// Any bytes as the body of a request, through the whole of the server but HTTP and providers. What comes back has to be
-// XML that a client can read.
+// Any bytes as the body of a request, through the whole server except HTTP and providers. The response must be XML that
+// a client can read.
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
