@@ -1,7 +1,7 @@
-# What ./run and ./test share: one clear sentence when something is wrong, packages, room on the disk, building.
-# Sourced by them with the checkout as the working directory.
+# Shared by ./run and ./test: one clear sentence when something is wrong, packages, disk space, building. They source it
+# with the checkout as the working directory.
 
-# What the program needs to be built, and what the tests need besides.
+# The packages that the build needs, and those that the tests need in addition.
 build_packages=(g++ cmake ninja-build pkg-config python3-minimal libspdlog-dev libfmt-dev nlohmann-json3-dev
   libtomlplusplus-dev libcli11-dev libmnl-dev libsystemd-dev libmicrohttpd-dev zlib1g-dev libpugixml-dev
   libcurl4-openssl-dev)
@@ -14,7 +14,7 @@ die() {
   exit 1
 }
 
-# need_room MEGABYTES: stops where the checkout's disk has less left.
+# need_room MEGABYTES: ends the script if the checkout's disk has less free space.
 need_room() {
   local free
   free=$(df --output=avail -m . 2>/dev/null | tail -n 1 | tr -d ' ')
@@ -30,7 +30,7 @@ missing_packages() {
   done
 }
 
-# need_packages PACKAGE...: installs those that are missing, with apt-get.
+# need_packages PACKAGE...: installs the missing ones with apt-get.
 need_packages() {
   command -v dpkg-query >/dev/null || die "this needs Debian 12 or a system like it: there is no dpkg here to install packages with"
   local missing as_root=() log=build/apt.log
@@ -54,13 +54,13 @@ need_packages() {
   fi
 }
 
-# build PRESET [TARGET...]: configures once and builds what is not up to date; quiet where there is nothing to do.
+# build PRESET [TARGET...]: configures once and builds what is not up to date; prints nothing if there is nothing to do.
 build() {
   local preset=$1 log
   shift
   log=build/$preset.log
   mkdir -p build/"$preset" || die "cannot write to $PWD/build"
-  # One build of a preset at a time: two would spoil each other's files.
+  # Only one build of a preset at a time: two would damage each other's files.
   exec 9>build/"$preset".lock
   flock 9
   if [ ! -f build/"$preset"/build.ninja ]; then
