@@ -1,5 +1,5 @@
-// Every association of a host with three interfaces and a service processor, held against a table that was written out
-// by hand: the provider library and the companions as a CIM server loads them, asked through the broker.
+// Compares every association of a host with three interfaces and a service processor with a table that was written by
+// hand. The provider library and the companions are loaded as a CIM server does it, and asked through the broker.
 #include <gmock/gmock.h>
 #include <stdlib.h>
 
@@ -36,7 +36,7 @@ constexpr const char* kTree = R"({ "system_name": "host1", "nodes": [
       "enabled_state": 1,
       "addresses": [ { "address": "192.0.2.20", "prefix_length": 24, "origin": "static" } ] } } ] } ] } ] })";
 
-// What the associations of a class are: "left end -> right end", each end by what names it, and the further properties.
+// The associations of a class: "left end -> right end", each end by its identifying key, and the further properties.
 struct Row {
   const char* className;
   const char* left;
@@ -45,7 +45,7 @@ struct Row {
 };
 
 const Row kRows[] = {
-    // Nothing in the tree says which interface reaches which server: each is paired with each.
+    // The tree does not say which interface can reach which server, so all are paired.
     {"ZORVA_RemoteAccessAvailableToElement",
      "Antecedent",
      "Dependent",
@@ -176,7 +176,7 @@ TEST_P(AssociationTable, IsWhatNamesTell) {
   EXPECT_THAT(lines, UnorderedElementsAreArray(pairs()));
 }
 
-// Each association is fetched by the name under which it was enumerated.
+// Each association is fetched by its name in the enumeration.
 TEST_P(AssociationTable, EachIsFoundByItsName) {
   std::vector<broker::ObjectPath> paths;
   broker_->enumerateInstanceNames("root/cimv2", GetParam().className, [&](const broker::ObjectPath& association) {

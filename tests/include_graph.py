@@ -49,7 +49,7 @@ def file_arrows():
 
 
 def graph(arrows, node):
-    """The arrows between the nodes that `node` makes of files."""
+    """The edges between the nodes that `node` makes of files."""
     result = {}
     for source, target in arrows:
         a, b = node(source), node(target)

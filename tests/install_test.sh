@@ -1,6 +1,5 @@
 #!/bin/sh
-# Installs a build under a folder of its own, and runs what lies there: the programs must find the libraries beside
-# them.
+# Installs a build into its own folder, and runs it from there: the programs must find the libraries beside them.
 #
 #   install_test.sh BUILD-FOLDER
 set -eu

@@ -1,4 +1,4 @@
-// The provider library as a CIM server meets it: a file that is loaded, asked for its create functions and unloaded.
+// The provider library as a CIM server uses it: a file that is loaded, searched for its create functions and unloaded.
 #include <ProviderCall.h>
 #include <dlfcn.h>
 #include <gmock/gmock.h>
@@ -44,7 +44,7 @@ const std::set<std::string> kCreateFunctions = {
     "DNSOrderedComponentProvider_Create_AssociationMI",
 };
 
-// The lines that a command writes.
+// The output lines of a command.
 std::vector<std::string> linesOf(const std::string& command) {
   const std::unique_ptr<std::FILE, int (*)(std::FILE*)> pipe(::popen(command.c_str(), "r"), ::pclose);
   if (pipe == nullptr) throw std::runtime_error("cannot run " + command);
@@ -56,7 +56,7 @@ std::vector<std::string> linesOf(const std::string& command) {
   return lines;
 }
 
-// A library from its loading to its unloading.
+// A library, loaded by the constructor and unloaded by the destructor.
 class Loaded {
  public:
   Loaded() : handle_(::dlopen(kLibrary.c_str(), RTLD_NOW | RTLD_LOCAL)) {
@@ -124,7 +124,7 @@ TEST(Library, CarriesItsNameAndVersion) {
   EXPECT_TRUE(isNamed);
 }
 
-// The first three words of every MI's function table are alike.
+// The first three words of every MI's function table are the same.
 struct AnyMI {
   void* hdl;
   const struct {
@@ -142,7 +142,7 @@ TEST(Library, EachCreateFunctionIsFoundByItsNameAndNeedsNoStatus) {
     ASSERT_NE(nullptr, create) << name;
     const AnyMI* const mi = create(nullptr, nullptr, nullptr);
     ASSERT_NE(nullptr, mi) << name;
-    // "Association", "Instance" or "Method" behind the last "_Create_", in small letters in front of the prefix
+    // "Association", "Instance" or "Method" after the last "_Create_", in small letters before the prefix
     const std::size_t end = name.rfind("_Create_");
     std::string kind = name.substr(end + 8, name.size() - end - 8 - 2);
     kind[0] = static_cast<char>(std::tolower(static_cast<unsigned char>(kind[0])));

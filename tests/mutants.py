@@ -23,7 +23,7 @@ import threading
 import time
 
 FOLDERS = ["trace", "model", "settings", "factory", "providers"]
-# The programs that test the library, and which of them stand nearest to a source. The faults are left out: they ask
+# The programs that test the library, and which of them are nearest to a source. The faults are left out: they test
 # whether the library survives, which no mutant changes, and take a minute.
 PROGRAMS = [
     "trace_test", "model_test", "settings_test", "settings_line_feed_test", "factory_client_test",
@@ -54,7 +54,7 @@ class Mutant:
     file: str
     line: int  # counted from 0
     kind: str
-    changed: tuple  # the lines that take the place of as many from `line` on
+    changed: tuple  # the lines that replace as many lines from `line` on
 
 
 def code_of(line):
@@ -93,7 +93,7 @@ def mutants_of_line(file, number, line):
             yield replaced(blank, blank + 1, "", "blank in text")
     for m in re.finditer(r"(?<![\w.])(\d+)(?![\w.])", code):
         if outside(m.start()):
-            # 1 is often a failure, which callers tell from 0 alone.
+            # 1 is often a failure, which callers only compare with 0.
             other = "0" if m.group() == "1" else str(int(m.group()) + 1)
             yield replaced(m.start(), m.end(), other, "number")
     for m in re.finditer(r" (==|!=|<=|>=|<|>) ", code):
@@ -111,7 +111,7 @@ def mutants_of_line(file, number, line):
             yield replaced(m.start(), m.end(), "", "comparison")
 
 
-# A call that stands as a statement of its own on one line.
+# A call that is a whole statement on one line.
 CALL = re.compile(r"\s*[\w:]+(?:(?:->|\.)\w+)*\(.*\);(\s*//.*)?$")
 
 
@@ -134,14 +134,14 @@ def sources(root):
 
 
 def draw(root, count, seed):
-    """All possible mutants in an order such that every beginning of it is spread over all sources."""
+    """All possible mutants in an order in which every beginning is spread over all sources."""
     generator = random.Random(seed)
     placed = []
     for file in sources(root):
         own = list(mutants_of(file, (root / file).read_text()))
         generator.shuffle(own)
         placed += [((i + generator.random()) / len(own), mutant) for i, mutant in enumerate(own)]
-    # Every source is drawn from at least once, however little can be changed in it.
+    # Every source gets at least one, even if little can be changed in it.
     placed.sort(key=lambda pair: pair[0])
     seen, first, rest = set(), [], []
     for _, mutant in placed:
@@ -151,7 +151,7 @@ def draw(root, count, seed):
 
 
 class Worker:
-    """A copy of the tree with a build of its own."""
+    """A copy of the tree with its own build."""
 
     def __init__(self, root, directory, programs):
         self.tree = directory / "tree"
@@ -186,7 +186,7 @@ class Worker:
         return done.returncode == 0
 
     def judge(self, mutant):
-        """The program that kills the mutant, "" where none does, None where it does not compile."""
+        """The program that kills the mutant, "" if none does, None if it does not compile."""
         path = self.tree / mutant.file
         original = path.read_text()
         lines = original.split("\n")

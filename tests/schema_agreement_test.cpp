@@ -1,5 +1,5 @@
-// What the providers really set, held against the classes that they publish: a property that a class lacks, or has with
-// another type, would be refused by the broker and lost on its way to the client.
+// Compares what the providers set with the classes that they publish. A property that a class lacks, or has with
+// another type, would be refused by the broker and never reach the client.
 #include <ProviderCall.h>
 #include <RecordingBroker.h>
 #include <World.h>
@@ -56,7 +56,7 @@ const Published kPublished[] = {
 void PrintTo(const Published& published, std::ostream* out) { *out << published.className; }
 
 // CMPI's name of the type that a class declares, as describe() writes it. A text is set as chars, which the broker
-// turns into a string.
+// converts to a string.
 std::string setAs(const zorva::schema::ClassProperty& property) {
   if (property.type == zorva::schema::Type::Reference) return "ref";
   const std::string name(zorva::schema::typeName(property.type));

@@ -72,7 +72,7 @@ void Phrases::add(const SourceLine& pattern, std::vector<SourceLine> body) {
 
 namespace {
 
-// Where the text in quotes or braces that begins at from has its end; npos where it has none.
+// The end of the text in quotes or braces that begins at from; npos if it has none.
 std::size_t endOfBracketed(const std::string& text, std::size_t from) {
   int depth = 0;
   bool isQuoted = false;
@@ -92,8 +92,8 @@ std::size_t endOfBracketed(const std::string& text, std::size_t from) {
   return std::string::npos;
 }
 
-// Where a place that begins at from ends, with the words after it behind: it takes one word, or a text in quotes or
-// braces. npos where nothing fits.
+// The end of a place that begins at from and has the given words after it. A place is one word, or a text in quotes or
+// braces. npos if nothing fits.
 std::size_t endOfPlace(const std::string& text, std::size_t from, const std::string& after) {
   if (from >= text.size()) return std::string::npos;
   if (text[from] == '"' || text[from] == '{') {
@@ -187,14 +187,14 @@ std::string Case::testName() const {
 
 namespace {
 
-// Reads a file line by line: headings stand at the margin, what belongs to them is indented.
+// Reads a file line by line: headings begin at the margin, the lines that belong to them are indented.
 class Reader {
  public:
   Reader(const std::string& text, std::string name) : in_(text), name_(std::move(name)) { advance(); }
 
   bool atEnd() const { return !heading_.has_value(); }
 
-  // The next heading, whose word ends in a colon, and what stands behind it.
+  // The next heading, a word that ends in a colon, and the text after it.
   struct Section {
     std::string word;
     SourceLine rest;
@@ -243,7 +243,7 @@ class Reader {
   std::vector<SourceLine> body_;
 };
 
-// What stands behind the colon counts as the first line.
+// The text after the colon counts as the first line.
 std::vector<SourceLine> allLines(const Reader::Section& section) {
   std::vector<SourceLine> lines;
   if (!section.rest.text.empty()) lines.push_back(section.rest);

@@ -17,12 +17,12 @@ namespace ZV::Test {
 
 namespace {
 
-// Ends of a request that let something fly out.
+// Ends of a request that throws.
 const std::string kOutOfRange = "std::out_of_range";
 const std::string kException = "an exception: ";
 const std::string kInt = "an int that was thrown";
 
-// What came of a request, in the notation of a case.
+// The result of a request, in the notation of a case.
 struct Observed {
   std::vector<std::string> happens;
   std::vector<std::string> gives;
@@ -67,8 +67,8 @@ std::string stepOf(const LogLine& line, const std::string& dataDir) {
       "log " + std::to_string(line.level) + " " + line.category + " " + line.function + ": " + formOf(line, dataDir);
   const std::string parameters = line.parameters();
   if (!parameters.empty()) step += "," + parameters;
-  // The place that the text names is the place that the logger was given, but for the marks, which stand in the header
-  // that all share and name the provider's place.
+  // The place in the text is the place that the logger got. The exception are the marks of entry and exit: they are
+  // logged from a shared header and name the provider's place in their text.
   const bool isMark = line.function == "markProviderEntry" || line.function == "markProviderExit";
   if (isMark ? line.file != "trace/Trace.h" : line.file != line.toldFile() || line.line != line.toldLine()) {
     step += " (at " + line.file + ":" + std::to_string(line.line) + ", though the text has " + line.toldFile() + ":" +
@@ -183,7 +183,7 @@ std::vector<std::string> changesBetween(const State& before, const State& after)
 
 // --- one run
 
-// All parts of a case that set it up, with their phrases written out.
+// All parts of a case that set it up, with their phrases replaced.
 struct Setting {
   std::vector<WrittenLine> world;
   std::vector<WrittenLine> broker;
@@ -219,9 +219,10 @@ Setting settingOf(const CaseFile& file, const Case& one) {
   return setting;
 }
 
-// The one failure of a case that is due at a call of a number, counted over all calls of the broker or of the tree.
+// The failure of a case that must happen at the call with a number, counted over all calls of the broker or of the
+// tree.
 struct DueFailure {
-  const Failure* failure = nullptr;  // null where none is due
+  const Failure* failure = nullptr;  // null if no call fails
   std::size_t place = 0;
 
   bool isOfTree() const { return failure != nullptr && failure->isOfTree(); }
@@ -234,7 +235,7 @@ void arm(RecordingBroker& broker, const std::vector<Failure>& failures, const Du
   if (due.failure != nullptr && !due.isOfTree()) broker.failAt(due.place, due.failure->mode);
 }
 
-// Asks, and says how it ended, but for what was left open.
+// Runs the request and returns how it ended, without what is missing at the end.
 std::string endOf(const Setting& setting, RecordingBroker& broker, const RequestObjects& objects) {
   Request request = setting.request;
   try {
@@ -281,7 +282,7 @@ Observed observe(const Setting& setting, const DueFailure& due) {
   return observed;
 }
 
-// The place of the n-th call of a kind among all calls.
+// The number among all calls of the n-th call of a kind.
 template <typename Calls, typename IsOfKind>
 std::size_t placeOfCall(const Calls& calls, const Failure& failure, const IsOfKind& isOfKind) {
   std::size_t found = 0;
@@ -300,7 +301,7 @@ std::size_t placeOf(const Failure& failure, const Observed& observed) {
                      [&failure](const RecordedCall& call) { return call.name == failure.call; });
 }
 
-// A failure at the n-th call of a kind is placed by a run without it.
+// To find the call number of the n-th call of a kind, the request first runs without the failure.
 Observed observe(const Setting& setting) {
   RecordingBroker unused;
   const std::vector<Failure> failures = furnish(unused, setting.broker);
@@ -327,7 +328,7 @@ std::string stepAt(const std::vector<std::string>& steps, std::size_t at) {
   return at < steps.size() ? steps[at] : std::string("nothing more");
 }
 
-// The first difference with the steps before and behind it.
+// The first difference with the steps before and after it.
 std::string difference(const std::vector<WrittenLine>& expected, const std::vector<std::string>& actual,
                        const std::string& part, const SourceLine& title) {
   std::size_t at = 0;
@@ -352,7 +353,7 @@ std::string linesOf(const std::vector<std::string>& lines) {
   return all;
 }
 
-// The steps of a case; the word nothing stands for none.
+// The steps of a case; the word nothing means none.
 std::vector<WrittenLine> stepsOf(const CaseFile& file, const Case& one) {
   if (one.happens.size() == 1 && one.happens.front().text == "nothing") return {};
   std::vector<WrittenLine> steps = file.phrases.writeOut(one.happens);

@@ -1,4 +1,4 @@
-// Runs a case: makes its host and its broker, asks the provider, and holds what came of it against what the case says.
+// Runs a case: makes its host and its broker, calls the provider, and compares the result with the case.
 #pragma once
 
 #include <cmpidt.h>
@@ -9,13 +9,13 @@
 
 namespace ZV::Test {
 
-// What is to be told of a case that does not hold, beginning with the place of the first difference; empty where it
-// holds. Throws CaseError where the case cannot be understood. No other World or RecordingLogger may be there
-// meanwhile. lie is added to the state of every good key, element and argument that the broker gives; no case may hold
-// less for it.
+// The report of a case that fails, beginning with the place of the first difference; empty if it passes. Throws
+// CaseError if the case cannot be understood. No other World or RecordingLogger may exist at the same time. lie is
+// added to the state of every good key, element and argument that the broker returns; it must not change the result of
+// any case.
 std::string differenceOf(const CaseFile& file, const Case& one, CMPIValueState lie = CMPI_goodValue);
 
-// What came of the case's request, in the notation of a case, with no phrase in it.
+// The result of the case's request, in the notation of a case, without phrases.
 std::string recordOf(const CaseFile& file, const Case& one);
 
 }  // namespace ZV::Test

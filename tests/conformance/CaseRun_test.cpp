@@ -20,7 +20,7 @@ const std::string kMarks =
     "phrase: complains\n"
     "  log 6000 Zorvagent.DNSClientProvider DNSClient_GetInstance: MESSAGE \"At least one key should be passed\"\n";
 
-// The one case of a file, whose provider's lines are the first.
+// The only case of a file, whose provider's lines come first.
 CaseFile fileOf(const std::string& rest, const std::string& provider = "DNSClientProvider") {
   return readCases("provider: " + provider + "\ncase: It\n" + rest + kMarks, "It.cases", {});
 }

@@ -42,7 +42,7 @@ void readNic(World& world, LineScanner& scanner) {
   world.nic(name, properties);
 }
 
-// False where the tree shall not be readable.
+// False if the tree must not be readable.
 bool readWorldLine(World& world, LineScanner& scanner) {
   bool isReadable = true;
   if (scanner.take("host")) {
@@ -60,7 +60,7 @@ bool readWorldLine(World& world, LineScanner& scanner) {
     const std::string nic = scanner.wordOrQuoted("the interface's name");
     world.file(nic, scanner.quoted("the content"));
   } else if (scanner.take("empty")) {
-    // a host without nodes, for a reader's eye
+    // a host without nodes, written out for the reader
   } else if (scanner.take("unreadable")) {
     isReadable = false;
   } else {
@@ -114,7 +114,7 @@ Failure readFailure(LineScanner& scanner) {
   return failure;
 }
 
-// "tree throws at 2 of selection by type" with ": int" for what is no std::exception
+// "tree throws at 2 of selection by type", with ": int" for an exception that is no std::exception
 Failure readTreeFailure(LineScanner& scanner) {
   Failure failure;
   failure.n = scanner.number("the call's number");

@@ -14,7 +14,7 @@ namespace ZV::Test {
 // The lines of a world, and installs it.
 void furnish(World& world, const std::vector<WrittenLine>& lines);
 
-// One call that shall fail: of the broker, or of a cursor in the tree.
+// One call that must fail: of the broker, or of a cursor in the tree.
 struct Failure {
   WrittenLine line;
   std::string call;  // the slot; empty for a call of the tree
@@ -26,7 +26,7 @@ struct Failure {
   bool isOfTree() const { return call.empty(); }
 };
 
-// The lines of a broker: sets up what it serves and how it answers, and gives back what shall fail.
+// Reads the lines of a broker: sets up its objects and answers, and returns the calls that must fail.
 std::vector<Failure> furnish(RecordingBroker& broker, const std::vector<WrittenLine>& lines);
 
 }  // namespace ZV::Test

@@ -1,5 +1,5 @@
-// Takes a line of a case apart: words, numbers, texts in quotes, values and object paths, in the notation in which the
-// recording broker shows them. What does not fit is a CaseError.
+// Splits a line of a case into words, numbers, texts in quotes, values and object paths, in the notation of the
+// recording broker. Anything else is a CaseError.
 #pragma once
 
 #include <cstddef>
@@ -19,14 +19,14 @@ class LineScanner {
 
   bool atEnd();
   void expectEnd();
-  // Takes the words if they come next, with a word's end behind them.
+  // Takes the words if they come next and end there.
   bool take(std::string_view words);
   void expect(std::string_view words);
 
   std::string word(const std::string& what);  // up to a blank, a comma or a colon
   unsigned int number(const std::string& what);
-  std::string quoted(const std::string& what);        // "a\nb", with \n, \t, \" and \\ for what they are in C
-  std::string wordOrQuoted(const std::string& what);  // a name that has no blanks needs no quotes
+  std::string quoted(const std::string& what);                   // "a\nb", with \n, \t, \" and \\ as in C
+  std::string wordOrQuoted(const std::string& what);             // a name that has no blanks needs no quotes
   std::vector<std::string> quotedList(const std::string& what);  // {"a", "b"}
   Value value();  // string "a", uint16 3, string[] {"a", null}, boolean true, ref (PATH), null
   Path path();    // //host/root/cimv2:CLASS.Key="a",Other=(PATH); without a namespace root/cimv2
@@ -46,7 +46,7 @@ class LineScanner {
   std::size_t at_ = 0;
 };
 
-// Rewrites an error of the line to the place where it stands in the case.
+// Adds the line's place in the case to an error.
 CaseError errorAt(const WrittenLine& line, const std::string& what);
 
 }  // namespace ZV::Test

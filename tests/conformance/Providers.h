@@ -10,11 +10,11 @@ namespace ZV::Test {
 struct ProviderFunctions {
   const char* prefix;
   CMPIInstanceMI* (*instance)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
-  CMPIAssociationMI* (*association)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);  // null where there is none
+  CMPIAssociationMI* (*association)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);  // null if there is none
   CMPIMethodMI* (*method)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);            // likewise
 };
 
-// Null where no provider has that prefix.
+// Null if no provider has that prefix.
 const ProviderFunctions* findProvider(const std::string& prefix);
 
 }  // namespace ZV::Test

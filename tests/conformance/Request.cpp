@@ -49,7 +49,7 @@ bool takesInstance(Operation operation) {
   return isOneOf(operation, {Operation::CreateInstance, Operation::ModifyInstance});
 }
 
-// One of the clauses behind the path, each with a comma before it.
+// One of the clauses after the path, each with a comma before it.
 void readClause(LineScanner& scanner, Request& request) {
   if (scanner.take("properties")) {
     request.properties = PropertyList(scanner.quotedList("a property's name"));

@@ -1,4 +1,4 @@
-// What a case asks of a provider.
+// The request of a case.
 #pragma once
 
 #include <cmpift.h>
@@ -47,25 +47,25 @@ struct Request {
   bool withoutHandle = false;  // of the instance
 };
 
-// The request in a case's lines; an association that is left out is the provider's own. Throws CaseError.
+// The request in a case's lines; the default association is the provider's own. Throws CaseError.
 Request readRequest(const std::vector<WrittenLine>& lines, const std::string& ownAssociation);
 
-// The objects that a provider is called with; made before the call is recorded.
+// The objects with which a provider is called; made before the call is recorded.
 struct RequestObjects {
   RequestObjects(RecordingBroker& broker, const Request& request);
 
   const CMPIContext* context;
   CMPIResult* result;
   CMPIObjectPath* ref;
-  CMPIInstance* instance;  // null where the request has none
+  CMPIInstance* instance;  // null if the request has none
   CMPIArgs* in;
   CMPIArgs* out;
 };
 
-// Makes the provider and asks it. Exceptions pass.
+// Makes the provider and calls it. Exceptions leave this function.
 CMPIStatus ask(const ProviderFunctions& provider, RecordingBroker& broker, Request& request,
                const RequestObjects& objects);
-// Whether the provider has the table that the operation stands in.
+// Whether the provider has the function table of the operation.
 bool canAsk(const ProviderFunctions& provider, Operation operation);
 
 }  // namespace ZV::Test

@@ -1,6 +1,6 @@
-// Makes a test of every case in the files of this folder, and for each file tests of all its cases over brokers whose
-// states lie. With ZORVA_CONFORMANCE_RECORD set in the environment a test
-// also prints what came of its request, in the notation of a case.
+// Makes a test of every case in the files of this folder, and for each file tests of all its cases over brokers that
+// return wrong states. With ZORVA_CONFORMANCE_RECORD set in the environment a test also prints the result of its
+// request, in the notation of a case.
 #include <gtest/gtest.h>
 
 #include <cstdlib>
@@ -39,7 +39,7 @@ class CaseTest : public ::testing::Test {
   const Case& one_;
 };
 
-// All cases of a file over a broker whose states lie.
+// All cases of a file over a broker that returns wrong states.
 class LyingStatesTest : public ::testing::Test {
  public:
   LyingStatesTest(std::shared_ptr<const CaseFile> file, CMPIValueState lie) : file_(std::move(file)), lie_(lie) {}
@@ -64,7 +64,7 @@ constexpr Lie kLies[] = {{"HoldWhereGoodValuesAreMarkedNull", CMPI_nullValue},
                          {"HoldWhereGoodValuesAreMarkedAsKeys", CMPI_keyValue},
                          {"HoldWhereGoodValuesAreMarkedBad", CMPI_badValue}};
 
-// Stands for a file that cannot be read.
+// A failing test for a file that cannot be read.
 class UnreadableTest : public ::testing::Test {
  public:
   explicit UnreadableTest(std::string reason) : reason_(std::move(reason)) {}
@@ -84,7 +84,7 @@ std::string contentOf(const std::filesystem::path& path) {
   return {std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>()};
 }
 
-// Whether a filter names one test alone, and that of another suite. A run of one test then reads one file alone.
+// Whether a filter names one test only, of another suite. A run of one test then reads one file only.
 bool isLeftOut(const std::string& suite) {
   const std::string filter = GTEST_FLAG_GET(filter);
   return filter.find_first_of("*?:-") == std::string::npos && filter.compare(0, suite.size() + 1, suite + ".") != 0;

@@ -1,4 +1,4 @@
-// The broker fails at each call that a request makes, in each way in which a broker can fail.
+// The broker fails at each call of a request, in each possible way.
 #include "FaultTest.h"
 
 namespace ZV::Test {
@@ -6,7 +6,7 @@ namespace {
 
 class BrokerFaults : public FaultTest {
  protected:
-  // Whether a call tells how it went by its status alone. It can fail by a code, and in no other way but to throw.
+  // Whether a call reports failure only by its status. Then it can fail only with a code or by throwing.
   static bool onlyGivesStatus(const std::string& call) {
     return call.starts_with("set") || call.starts_with("return") || call == "addKey";
   }
@@ -28,9 +28,9 @@ class BrokerFaults : public FaultTest {
         check, [mode](const RecordedCall& call) { return hasMode(call.name, mode); });
   }
 
-  // The code that a client gets is that of a call to the broker: the one that failed, or one that asked for a name that
-  // is not there, be it that it could not be set. Of the modifications, that of the endpoint and of an interface's
-  // settings may have one of its own.
+  // The client's code is that of a call to the broker: the one that failed, or one that asked for a missing name; the
+  // name may be missing because it could not be set. Of the modifications, those of the endpoint and of an interface's
+  // settings may have their own code.
   static void expectCodeOfTheBroker(const Request& request, std::size_t n, Mode mode, const Ending& ending,
                                     const Usual& usual) {
     const CMPIrc rc = ending.outcome.rc;
@@ -47,7 +47,7 @@ class BrokerFaults : public FaultTest {
     }
   }
 
-  // An exception that every run of the request has.
+  // An exception that the request throws even without a failure.
   static bool fliesAnyway(const Ending& ending, const Usual& usual) {
     return !usual.ending.returned() && ending.what == usual.ending.what;
   }
@@ -67,7 +67,7 @@ TEST_P(BrokerFaults, EndAsTheBrokerHasItAndLeaveNothingBehind) {
   report("broker", tried);
 }
 
-// Only the endpoint's modification holds an exception back, and answers with a failure.
+// Only the endpoint's modification catches an exception, and returns a failure.
 TEST_P(BrokerFaults, ExceptionsOfTheBrokerPassOn) {
   std::size_t tried = 0;
   for (const Request& request : requests()) {

@@ -10,8 +10,8 @@
 namespace ZV::Test {
 namespace {
 
-// After which failures the request is made once more without one. Under a sanitizer, which looks at the failures
-// themselves, all would take too long.
+// After which failures the request is repeated without one. Under a sanitizer, which checks the failures themselves,
+// repeating all would take too long.
 #ifdef ZORVA_SANITIZED
 constexpr std::size_t kLookAgainAfter = 6;
 #else
@@ -39,7 +39,7 @@ std::vector<std::string> linesOf(const std::string& text) {
   return lines;
 }
 
-// Whether the words of one text stand in the other in the same order, with some left out.
+// Whether the words of one text are in the other in the same order, with some left out.
 bool isThinnedOut(const std::string& thin, const std::string& full) {
   std::istringstream thinWords(thin);
   std::istringstream fullWords(full);
@@ -53,7 +53,7 @@ bool isThinnedOut(const std::string& thin, const std::string& full) {
   return true;
 }
 
-// A line KEY=value that is the usual one, or has less of its value.
+// A line KEY=value that is the usual one, or has only a part of its value.
 bool hasLessOf(const std::string& line, const std::string& usual) {
   const std::size_t split = usual.find('=');
   return split != std::string::npos && line.substr(0, split + 1) == usual.substr(0, split + 1) &&
@@ -77,7 +77,7 @@ bool isSame(const Ending& left, const Ending& right) {
   const Outcome& l = left.outcome;
   const Outcome& r = right.outcome;
   const auto isSameCall = [](const RecordedCall& a, const RecordedCall& b) { return a.line == b.line; };
-  const auto isSameLine = [](const LogLine& a, const LogLine& b) {  // the texts have addresses in them
+  const auto isSameLine = [](const LogLine& a, const LogLine& b) {  // the texts contain addresses
     return a.line == b.line && a.level == b.level && a.file == b.file && a.category == b.category;
   };
   return left.flown == right.flown && left.what == right.what && l.rc == r.rc && l.message == r.message &&
@@ -89,7 +89,7 @@ bool isSame(const Ending& left, const Ending& right) {
 
 FaultTest::FaultTest() : host_(tree()) {
   host_.serveOthers(broker_);
-  ZORVAGENT_LOG_ERROR("a line of the agent's own");  // from the first one on the recorder keeps room for them
+  ZORVAGENT_LOG_ERROR("a line of the agent's own");  // from the first line on the recorder keeps memory for them
 }
 
 Ending FaultTest::run(const Request& request) {
@@ -122,14 +122,14 @@ FaultTest::Usual FaultTest::usual(const Request& request) {
   if (changesFiles) {
     usual.files = host_.files();
     host_.restore();
-    zorva::agent::currentTree();  // so that the agent holds what it held before
+    zorva::agent::currentTree();  // so that the agent holds the same as before
   }
   broker_.startOver();
   return usual;
 }
 
 std::size_t FaultTest::failEachCall(const Request& request, const Fail& fail, const Check& check, const IsNew& isNew) {
-  usual(request);  // what is made once for the process is there from now on
+  usual(request);  // objects that are made once for the process exist from now on
   const Usual asUsual = usual(request);
   expectWellFormed(asUsual.ending, asUsual);
   const long blocks = liveBlocks();
@@ -167,13 +167,12 @@ void FaultTest::expectAsEver(const Request& request, const Usual& asUsual, long 
     EXPECT_TRUE(isSame(asUsual.ending, again.ending)) << "ends otherwise than before: " << again.ending;
     EXPECT_EQ(asUsual.files, again.files);
   }
-  if (HasFailure()) return;  // which takes memory itself
+  if (HasFailure()) return;  // a failure message takes memory itself
   EXPECT_EQ(blocks, liveBlocks()) << "memory stays behind";
   EXPECT_EQ(files, openFiles()) << "files stay open";
 }
 
-// Two associations pair by one name that occurs in another; a name that could not be read is empty, which occurs in
-// all.
+// Two associations compare by substring; a name that could not be read is empty, and every text contains it.
 std::size_t FaultTest::mostResults(const char* call, const Usual& asUsual) const {
   constexpr std::size_t kSystems = 2;
   const std::string_view name = provider().className;
@@ -209,7 +208,7 @@ void FaultTest::expectKnownFiles(const Request& request, const Usual& asUsual) c
   }
   for (const auto& [name, content] : now) {
     SCOPED_TRACE(name);
-    if (name == "overlay.json") continue;  // the agent's own form
+    if (name == "overlay.json") continue;  // written by the agent
     ASSERT_TRUE(asUsual.files.contains(name) && host_.filesAtFirst().contains(name)) << "a file that nobody made";
     const std::vector<std::string> lines = linesOf(content);
     const std::vector<std::string> usualLines = linesOf(asUsual.files.at(name));

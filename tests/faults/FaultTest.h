@@ -1,5 +1,5 @@
-// What the tests that make something fail have in common: one provider on one host, its requests, and what must hold
-// after each failure.
+// Shared by the tests that make something fail: one provider on one host, its requests, and what must be true after
+// each failure.
 #pragma once
 
 #include <gmock/gmock.h>
@@ -20,26 +20,26 @@
 
 namespace ZV::Test {
 
-// How a request ended: with an outcome, or with what flew out of it.
+// How a request ended: with an outcome, or with an exception.
 struct Ending {
   enum class Flown { Nothing, Failure, Other };  // a std::exception; anything else
 
   Flown flown = Flown::Nothing;
   std::string what;  // of the std::exception
-  Outcome outcome;   // where nothing flew; else only its lines and calls
+  Outcome outcome;   // if nothing was thrown; else only its lines and calls
   bool returned() const { return flown == Flown::Nothing; }
 };
 
-// Whether two endings are alike in everything that a client, the broker or a reader of the log would see.
+// Whether a client, the broker or a reader of the log would see no difference between two endings.
 bool isSame(const Ending& left, const Ending& right);
 std::ostream& operator<<(std::ostream& out, const Ending& ending);
 
-// How many failures were tried of a kind ("broker"), told when the program ends.
+// Counts the tried failures of a kind ("broker"). The sums are printed when the program ends.
 void countFaults(const std::string& kind, std::size_t tried);
 
 class FaultTest : public ::testing::TestWithParam<std::tuple<Tree, std::size_t>> {
  protected:
-  // A request and how it ends where nothing fails.
+  // A request and its end without failures.
   struct Usual {
     Ending ending;
     std::map<std::string, std::string> files;  // as a modification leaves them
@@ -51,27 +51,27 @@ class FaultTest : public ::testing::TestWithParam<std::tuple<Tree, std::size_t>>
   Tree tree() const { return std::get<0>(GetParam()); }
   std::vector<Request> requests() const { return requestsOf(provider()); }
 
-  // Makes the request and takes whatever flies out of it. What the provider made is freed.
+  // Runs the request and catches its exceptions. All objects that the provider made are freed.
   Ending run(const Request& request);
-  // The same from the host as it was at first.
+  // The same on the host in its first state.
   Usual usual(const Request& request);
 
-  // Makes the request with something failing at its 1st call, its 2nd, and so on. fail starts and ends that failure
-  // about the run and says whether it was reached; check judges how the request ended; and then the host is as it was
-  // but for what check allows, and the request without failures ends as ever, with no memory or file left behind.
-  // Returns the number of failures. isNew may pass over calls that would fail as they did before.
+  // Runs the request with a failure at its 1st call, its 2nd, and so on. fail starts and ends the failure and says
+  // whether it was reached; check examines how the request ended. Then the host must be unchanged except for what check
+  // allows, and the request without failures must end as usual, with no memory or file left open. Returns the number of
+  // failures. isNew may skip calls that would fail as they did before.
   using Fail = std::function<bool(std::size_t n, const std::function<void()>& run)>;
   using IsNew = std::function<bool(const RecordedCall& call)>;
   using Check = std::function<void(std::size_t n, const Ending& ending, const Usual& usual)>;
   std::size_t failEachCall(const Request& request, const Fail& fail, const Check& check, const IsNew& isNew = {});
 
-  // Of every ending: nothing is handed out behind returnDone, which comes once at most; nothing is released; the entry
-  // is marked; there are no more results than usual; and no exception of the library's own flies but the one that is
-  // told of one class: a host without settings of its own has no first one to pair with an assignment.
+  // True of every ending: nothing is returned after returnDone, which is called at most once; nothing is released; the
+  // entry is logged; there are no more results than usual. The library throws no exception of its own, except in one
+  // class: a host without settings has no first setting to pair with an assignment.
   void expectWellFormed(const Ending& ending, const Usual& usual) const;
 
-  // A modification left each line of each file either as it was, or as it usually makes it, or with the text that could
-  // not be read left out of it; and nothing else anywhere. A read left everything.
+  // After a modification each line of each file is either unchanged, or as usual, or as usual without the text that
+  // could not be read; nothing else changes. A read changes nothing.
   void expectKnownFiles(const Request& request, const Usual& usual) const;
 
   void report(const char* kind, std::size_t tried) const;

@@ -146,12 +146,12 @@ ssize_t __wrap_write(int file, const void* buffer, size_t size) {
 
 int __wrap_close(int file) {
   const bool fails = refuses(FileCall::Close, EIO);
-  const int closed = __real_close(file);  // a descriptor is gone even then
+  const int closed = __real_close(file);  // the descriptor is closed even then
   if (fails) errno = EIO;
   return fails ? -1 : closed;
 }
 
-// What a test writes need not outlive a power cut, and syncing takes most of the time.
+// A test's files need not survive a power failure, and syncing takes most of the time.
 int __wrap_fsync(int) { return refuses(FileCall::Fsync, EIO) ? -1 : 0; }
 
 int __wrap_rename(const char* from, const char* to) {

@@ -1,7 +1,7 @@
-// Stands between this program and the C library where files are read and written, and makes one call fail.
+// Replaces the C library's functions that read and write files, and makes one call fail.
 //
-// The linker puts these in the place of the functions (--wrap), for the objects that are linked into the program: the
-// providers and the agent. What the shared C++ library calls on its own is left alone.
+// The linker replaces the functions (--wrap) in the objects that are linked into the program: the providers and the
+// agent. Calls inside the shared C++ library are not replaced.
 #pragma once
 
 #include <cstddef>
@@ -32,14 +32,14 @@ inline constexpr std::size_t kFileCalls = 16;
 const char* nameOf(FileCall call);
 
 enum class FileFault {
-  Refused,      // the call fails and has done nothing: no permission, no descriptor left, no space, a bad disk
-  HalfDone,     // fputs, read and write move a part; fclose loses what was not written yet; others as Refused
-  Interrupted,  // read, write and flock by a signal, which is no failure; others are left alone
+  Refused,      // the call fails and does nothing: no permission, no descriptor left, no space, a bad disk
+  HalfDone,     // fputs, read and write handle a part; fclose loses unwritten data; others as Refused
+  Interrupted,  // read, write and flock by a signal, which is no failure; others are not changed
 };
 inline constexpr FileFault kAllFileFaults[] = {FileFault::Refused, FileFault::HalfDone, FileFault::Interrupted};
 const char* nameOf(FileFault fault);
 
-// Makes the n-th call from now on fail, counted from 1, or counts calls where n is 0. One at a time, on one thread.
+// Makes the n-th call from now on fail, counted from 1, or only counts calls if n is 0. One at a time, on one thread.
 class FailingFiles {
  public:
   explicit FailingFiles(std::size_t n = 0, FileFault fault = FileFault::Refused);
@@ -49,10 +49,10 @@ class FailingFiles {
 
   const std::vector<FileCall>& calls() const { return calls_; }
   bool wasReached() const { return n_ != 0 && calls_.size() >= n_; }
-  // The call that failed, where one was reached.
+  // The call that failed, if one was reached.
   FileCall failed() const { return calls_.at(n_ - 1); }
 
-  // For the functions that stand in between. Whether this call is to fail.
+  // For the replacement functions: whether this call must fail.
   static bool fails(FileCall call);
   static FileFault fault();
   static bool hasFailedStream(const void* stream);

@@ -1,5 +1,4 @@
-// Each call that touches a file fails: those of the interfaces' files, and those of the values that are set through the
-// agent.
+// Each call on a file fails: on the interfaces' files, and on those of the values that are set through the agent.
 #include <algorithm>
 #include <array>
 #include <sstream>
@@ -15,14 +14,13 @@ using ::testing::AnyOf;
 
 class FileFaults : public FaultTest {
  protected:
-  // The files and nothing else make the difference: the same objects come, complete, with the code that they come with
-  // usually.
+  // Only the files make a difference: the same objects are returned, complete, with the usual code.
   static void expectSameObjects(const Request& request, const Ending& ending, const Usual& usual) {
     ASSERT_EQ(usual.ending.flown, ending.flown) << ending;
     const Outcome& now = ending.outcome;
     const Outcome& asUsual = usual.ending.outcome;
     if (request.name != "GetInstance of a name without keys" || now.rc != CMPI_RC_ERR_NOT_FOUND) {
-      EXPECT_EQ(asUsual.rc, now.rc) << now;  // there the broker tells of the key, and no later call takes that back
+      EXPECT_EQ(asUsual.rc, now.rc) << now;  // there the broker reports the key, and no later call replaces its code
     }
     EXPECT_EQ(asUsual.result.doneCount, now.result.doneCount);
     EXPECT_EQ(asUsual.markedExit(), now.markedExit());
@@ -34,7 +32,7 @@ class FileFaults : public FaultTest {
     }
   }
 
-  // A signal, or a part where the whole was asked for, is no failure where one can go on.
+  // A signal, or a partial read or write, is no failure if the program can continue.
   static bool makesNoDifference(FileFault fault, FileCall failed) {
     const bool goesOn = failed == FileCall::Read || failed == FileCall::Write || failed == FileCall::Flock;
     return fault == FileFault::Interrupted || (fault == FileFault::HalfDone && goesOn);
@@ -44,7 +42,7 @@ class FileFaults : public FaultTest {
     EXPECT_EQ(request.kind == Kind::Modify ? usual.files : host_.filesAtFirst(), host_.files());
   }
 
-  // A value that could not be read is that of the tree, or empty, or not there.
+  // A value that could not be read is that of the tree, or empty, or missing.
   static void expectOtherValuesOfFilesOnly(const Ending& ending, const Usual& usual) {
     for (std::size_t i = 0; i < ending.outcome.instances().size(); ++i) {
       const Instance& now = ending.outcome.instances()[i];
@@ -60,8 +58,8 @@ class FileFaults : public FaultTest {
     }
   }
 
-  // A file holds a rewriting in which pieces or the end are missing: what is there are the beginnings of old and new
-  // lines, of which one may run into the next.
+  // The file was rewritten without some pieces or the end: it has the beginnings of old and new lines, and one may
+  // continue with the next.
   static void expectCutShort(const std::string& content, const std::string& first, const std::string& usually) {
     const std::string known = "\n" + first + "\n" + usually;
     const auto isBeginning = [&](const std::string& text) { return known.find("\n" + text) != std::string::npos; };
@@ -85,7 +83,7 @@ class FileFaults : public FaultTest {
       if (isFirst) continue;
       ASSERT_EQ(Kind::Modify, request.kind) << content;
       if (name == "overlay.json") {
-        EXPECT_NO_THROW(zorva::agent::overlayEntries()) << content;  // whole, whichever of the values are in it
+        EXPECT_NO_THROW(zorva::agent::overlayEntries()) << content;  // complete, with or without each of the values
         continue;
       }
       ASSERT_TRUE(first != host_.filesAtFirst().end()) << "left behind";

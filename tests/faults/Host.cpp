@@ -34,7 +34,7 @@ void write(const std::string& path, const std::string& content) {
   if (!out.flush()) throw std::runtime_error("cannot write " + path);
 }
 
-// Files in memory, where there is a place for them, are written and removed many times faster.
+// Files in memory, if the system has a place for them, are written and removed many times faster.
 [[maybe_unused]] const bool kUsesMemory = [] {
   return ::access("/dev/shm", W_OK) == 0 && ::setenv("TMPDIR", "/dev/shm", 0) == 0;
 }();

@@ -1,4 +1,4 @@
-// The hosts that requests are made on, and all that lasts on them from one request to the next.
+// The hosts for the requests, and everything on them that lasts from one request to the next.
 #pragma once
 
 #include <map>
@@ -14,8 +14,8 @@ inline constexpr Tree kAllTrees[] = {Tree::Empty, Tree::OneInterface, Tree::Thre
 const char* nameOf(Tree tree);
 
 // A host without interfaces; one with one; one with three, of which one is the service processor's, two have a file and
-// the one without has a value that was set through the agent. Installed at once, as a World is, and looked at so often
-// that the agent has gone over from comparing the file of set values to being told of its changes.
+// the one without has a value that was set through the agent. Installed at once, as a World is, and read so often that
+// the agent is notified of changes of the overlay file and no longer compares it.
 class Host {
  public:
   explicit Host(Tree tree);
@@ -23,13 +23,13 @@ class Host {
   // The objects of this host that other providers serve.
   void serveOthers(RecordingBroker& broker) const;
 
-  // Every file of the data directory with its bytes: the interfaces' files, and the values that were set. The lock
-  // file, which is empty and stays, is left out.
+  // Every file of the data directory with its bytes: the interfaces' files, and the overlay. The lock file, which is
+  // empty and stays, is left out.
   std::map<std::string, std::string> files() const;
   const std::map<std::string, std::string>& filesAtFirst() const { return filesAtFirst_; }
-  // Makes the files what they were at first; nothing is touched where they are.
+  // Restores the files to their first state; nothing is touched if they are unchanged.
   void restore();
-  // Has the agent read the values that were set once more, at its next look: their file is written anew as it is.
+  // Makes the agent read the overlay again at its next look: its file is rewritten unchanged.
   void touch() const;
 
  private:

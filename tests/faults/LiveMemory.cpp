@@ -11,7 +11,7 @@ namespace {
 std::atomic<long> blocks{0};
 
 void* allocate(std::size_t size, std::size_t alignment) {
-  // aligned_alloc wants a multiple of the alignment
+  // aligned_alloc needs a multiple of the alignment
   void* const block = alignment == 0 ? std::malloc(size == 0 ? 1 : size)
                                      : std::aligned_alloc(alignment, (size + alignment) / alignment * alignment);
   if (block == nullptr) throw std::bad_alloc();
@@ -27,7 +27,7 @@ void release(void* block) {
 
 }  // namespace
 
-// All other forms of the library's own come down to these.
+// All other forms in the library call these.
 void* operator new(std::size_t size) { return allocate(size, 0); }
 void* operator new[](std::size_t size) { return allocate(size, 0); }
 void* operator new(std::size_t size, std::align_val_t alignment) {

@@ -1,11 +1,11 @@
-// What the program holds of memory and of files, to show that nothing stays behind.
+// The memory and the files that the program holds, to show that nothing is left over.
 #pragma once
 
 #include <cstddef>
 
 namespace ZV::Test {
 
-// How many blocks of operator new have not been given back, in the whole program.
+// How many blocks of operator new are not freed, in the whole program.
 long liveBlocks();
 
 // How many file descriptors are open.

@@ -112,7 +112,7 @@ void addInstanceRequests(const Provider& provider, std::vector<Request>& all) {
   all.push_back(
       {"EnumInstanceNames", Kind::Read, asking(create, [=](auto& mi) { return mi.enumerateInstanceNames(name); })});
   all.push_back({"EnumInstances", Kind::Read, asking(create, [=](auto& mi) { return mi.enumerateInstances(name); })});
-  if (!provider.isAssociation()) {  // there the list is handed to the broker, and the calls are the same
+  if (!provider.isAssociation()) {  // there the list is passed to the broker, and the calls are the same
     all.push_back({"EnumInstances with a property list", Kind::Read,
                    asking(create, [=](auto& mi) { return mi.enumerateInstances(name, PropertyList(keys)); })});
   }

@@ -1,5 +1,5 @@
-// Each call fails with which the agent reads a host: from the live one, or from a document. What could not be read for
-// a reason that passes is there at the next look.
+// Each call with which the agent reads a host fails: a live host, or a document. What could not be read for a temporary
+// reason is there at the next look.
 #include <gmock/gmock.h>
 
 #include <algorithm>

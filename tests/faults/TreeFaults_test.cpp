@@ -1,4 +1,4 @@
-// The instrumentation throws at each call that a request makes of it: a std::exception, or something else.
+// The instrumentation throws at each call of a request: a std::exception, or something else.
 #include <string_view>
 
 #include "FaultTest.h"
@@ -10,7 +10,7 @@ namespace {
 
 using zorva::agent::TreeCall;
 
-// Takes down each call of the tree with its place among the lines of the log.
+// Records each call of the tree with its place among the log lines.
 class TreeCalls : private zorva::agent::TreeCallHook {
  public:
   TreeCalls() { zorva::agent::setTreeCallHook(this); }
@@ -30,17 +30,17 @@ class TreeCalls : private zorva::agent::TreeCallHook {
   std::vector<Placed> all_;
 };
 
-// What becomes of an exception that a call of the tree throws.
+// The effect of an exception that a call of the tree throws.
 enum class Fate {
-  Flies,         // to the server, as it is
-  CaughtIfStd,   // told as "Caught Exception" where it is a std::exception
-  CaughtAlways,  // told as a node that could not be selected
+  Flies,         // to the server, unchanged
+  CaughtIfStd,   // logged as "Caught Exception" if it is a std::exception
+  CaughtAlways,  // logged as a node that could not be selected
 };
 
 class TreeFaults : public FaultTest {
  protected:
-  // Three functions hold exceptions back while they run; the log tells when that is. The walk of the clients does so
-  // only once it has made its cursor.
+  // Three functions catch exceptions while they run; the log shows when that is. The walk of the clients does so only
+  // after it has made its cursor.
   static bool isHeldBack(const std::vector<TreeCalls::Placed>& calls, std::size_t n, const LogLines& lines) {
     bool isInside = false;
     bool hasCursor = false;
@@ -61,7 +61,7 @@ class TreeFaults : public FaultTest {
     return hasCursor || (n > 0 && calls[n - 1].place > latest->place);
   }
 
-  // The cursor over the settings of the whole host stands on no node where none can be selected.
+  // The cursor over the settings of the whole host is on no node if none can be selected.
   bool walksSettingsOfTheHost() const {
     for (const char* name : {"ZORVA_DNSGeneralSettingData", "ZORVA_DNSGeneralElementSettingData",
                              "ZORVA_DNSGenEndPointElementSettingData", "ZORVA_DNSGenOrderedComponent"}) {
@@ -91,7 +91,7 @@ class TreeFaults : public FaultTest {
     }
   }
 
-  // No first one of the host's settings is there to be paired: told by an exception of its own.
+  // There is no first setting of the host to be paired: reported by an exception of the library's own.
   bool lacksSettings(const Ending& ending) const {
     return std::string_view("ZORVA_DNSGenOrderedComponent") == provider().className &&
            ending.what.find("_M_range_check") != std::string::npos;
@@ -110,7 +110,7 @@ class TreeFaults : public FaultTest {
                        : fate == Fate::CaughtIfStd ? "Caught Exception"
                                                    : "Select Node for NetworkIPConfig failed";
     EXPECT_THAT(ending.outcome.errors(), ::testing::Contains(told));
-    const bool asksForNoKey = request.name == "GetInstance of a name without keys";  // which the broker tells
+    const bool asksForNoKey = request.name == "GetInstance of a name without keys";  // which the broker reports
     EXPECT_THAT(ending.outcome.rc,
                 ::testing::AnyOf(isEndpointChange ? CMPI_RC_ERR_FAILED : CMPI_RC_OK,
                                  asksForNoKey ? CMPI_RC_ERR_NOT_FOUND : CMPI_RC_OK, asUsual.ending.outcome.rc));

@@ -9,7 +9,7 @@
 
 namespace ZV::Test {
 
-// A shared library from its loading to its unloading. mode is RTLD_LOCAL or RTLD_GLOBAL.
+// A shared library, loaded by the constructor and unloaded by the destructor. mode is RTLD_LOCAL or RTLD_GLOBAL.
 class Library {
  public:
   explicit Library(const std::string& path, int mode);
@@ -17,7 +17,7 @@ class Library {
   Library(const Library&) = delete;
   Library& operator=(const Library&) = delete;
 
-  // The library's own function of that name; throws std::runtime_error where it has none.
+  // The library's own function of that name; throws std::runtime_error if it has none.
   template <typename Function>
   Function find(const std::string& name) const {
     return reinterpret_cast<Function>(address(name));
@@ -39,7 +39,7 @@ struct ProviderNames {
 };
 const std::vector<ProviderNames>& allProviderNames();
 
-// A host of two interfaces in a document, which is what the agent reads as long as this lives.
+// A host of two interfaces in a document, which the agent reads as long as this object lives.
 class DocumentHost {
  public:
   DocumentHost();
@@ -51,10 +51,10 @@ class DocumentHost {
   zorva::agent::testing::TemporaryDirectory directory_;
 };
 
-// What other providers serve of that host.
+// The objects of that host that other providers serve.
 void serveOthers(RecordingBroker& broker);
 
-// Asks each of the twelve for everything that it has, and says how each request ended and what came.
+// Requests everything from each of the twelve, and reports how each request ended and its results.
 std::string askEverything(const Library& library, RecordingBroker& broker);
 
 }  // namespace ZV::Test

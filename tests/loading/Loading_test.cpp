@@ -1,5 +1,5 @@
-// The library in a process that is not its own: beside another that has all its names, loaded and unloaded again and
-// again, used by two brokers, and over an agent that cannot work.
+// The library in a foreign process: together with another that has all its names, loaded and unloaded repeatedly, used
+// by two brokers, and with an agent that cannot work.
 #include <dlfcn.h>
 #include <fcntl.h>
 #include <gmock/gmock.h>
@@ -32,7 +32,7 @@ void takeSyslogLine(const char* format, va_list arguments) {
 
 }  // namespace
 
-// In the place of the C library's, for every library in this process; the second is what a fortified build calls.
+// Replace the C library's functions for every library in this process; a fortified build calls the second one.
 extern "C" __attribute__((visibility("default"), format(printf, 2, 3))) void syslog(int, const char* format, ...) {
   va_list arguments;
   va_start(arguments, format);
@@ -85,7 +85,7 @@ TEST(SameNames, AreNotMixedUpWhicheverLibraryCameFirst) {
 }
 
 TEST(SameNames, LoadedGlobalTheLibraryGivesNothingAwayButItsCreateFunctions) {
-  // Not RTLD_DEFAULT: what is found by that is never unloaded.
+  // Not RTLD_DEFAULT: a library in which that finds a name is never unloaded.
   const std::unique_ptr<void, int (*)(void*)> global(::dlopen(nullptr, RTLD_NOW), ::dlclose);
   const Library library(providerLibraryPath(), RTLD_GLOBAL);
   EXPECT_NE(nullptr, ::dlsym(global.get(), "DNSClientProvider_Create_InstanceMI"));
@@ -119,7 +119,7 @@ TEST(LoadCycles, AHundredLeaveNothingBehind) {
 #else
   constexpr int kCycles = 100;
 #endif
-  // Malloc and the loader keep a little for later use. What came from operator new is counted to the block.
+  // Malloc and the loader keep a little for later use. The blocks of operator new are counted exactly.
   constexpr std::size_t kSlack = 64 << 10;
   const DocumentHost host;
   const std::string first = everythingAlone();
@@ -137,7 +137,7 @@ TEST(LoadCycles, AHundredLeaveNothingBehind) {
 
 // --- An agent that cannot work.
 
-// What a process of a server that has asked for nothing sees of a host whose agent has those files: the end of each
+// What a server's process sees of a host whose agent has those files, before it makes any request: the end of each
 // enumeration of the setting data, the lines on standard error, and those for syslog.
 struct Seen {
   std::vector<std::string> ends;
@@ -165,7 +165,7 @@ Seen enumerateTwice(const zorva::agent::testing::TemporaryDirectory& directory) 
     const Library library(providerLibraryPath(), RTLD_LOCAL);
     const auto create = library.find<InstanceProvider::Create>("DNSSettingDataProvider_Create_InstanceMI");
     InstanceProvider provider(create, broker);
-    try {  // in here: what flies is the library's own, and ends with it
+    try {  // caught here: the exception is the library's own, and ends with it
       for (int i = 0; i < 2; ++i) {
         const Outcome outcome = provider.enumerateInstances(Path("ZORVA_DNSSettingData"));
         seen.ends.push_back(std::string(nameOf(outcome.rc)) + (outcome.done() ? " done, " : " open, ") +
@@ -225,7 +225,7 @@ TEST(TwoBrokers, TheLatestThatCalledACreateFunctionIsAsked) {
 
     const InstanceProvider later(create, second);
     EXPECT_EQ(provider.mi(), later.mi()) << "the table is one for both";
-    // With the first broker's objects: what is made comes from the second, what is read and handed out is the first's.
+    // With the first broker's objects: objects are made by the second, arguments and results belong to the first.
     const Outcome mixed = provider.enumerateInstances(Path(className));
     EXPECT_EQ(alone.rc, mixed.rc);
     EXPECT_EQ(alone.instances(), mixed.instances());
@@ -255,8 +255,8 @@ TEST(TwoBrokers, AnAssociationsCreateFunctionCountsForItsInstancesToo) {
   }
 }
 
-// Two of the project's own brokers share the library; each gets what it would get alone, in turn and when the other has
-// gone.
+// Two of the project's own brokers share the library; each gets what it would get alone, alternately and after the
+// other is gone.
 TEST(TwoBrokers, EachGetsItsOwnAnswers) {
   const DocumentHost host;
   zorva::broker::BrokerOptions options;

@@ -1,5 +1,5 @@
 #!/usr/bin/env python3
-"""Writes the assembly of a library that defines every global symbol of an archive: whoever calls one aborts.
+"""Writes the assembly of a library that defines every global symbol of an archive: a call of any of them aborts.
 
 usage: generate_same_names.py NM ARCHIVE OUTPUT
 """
@@ -11,7 +11,7 @@ listing = subprocess.run([nm, "-g", "--defined-only", archive], check=True, capt
 names = {}
 for line in listing.splitlines():
     parts = line.split()
-    # Symbols of the sanitizers' own are left alone.
+    # Symbols of the sanitizers are left out.
     if len(parts) == 3 and "asan" not in parts[2] and "tsan" not in parts[2] and not parts[2].startswith("DW.ref"):
         names.setdefault(parts[2], parts[1])
 with open(output, "w", encoding="ascii") as out:

@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Compiles the library's five folders, unchanged, against other folders of headers, and looks that nothing came from the
-# project's own.
+# Compiles the library's five folders, unchanged, against other folders of headers, and checks that none of the
+# project's own is used.
 #
 # usage: other_headers_test.sh SOURCE-DIR WORK-DIR HEADERS C-COMPILER C++-COMPILER
 # HEADERS is "copied" for copies of the project's own, "other" for another vendor's agent and CMPI 2.1.
@@ -14,7 +14,7 @@ for compiler in "$4" "$5"; do
   command -v "$compiler" >/dev/null || { echo "skipped: there is no $compiler"; exit 77; }
 done
 
-# A compiler cache may answer with the dependencies of another folder's build.
+# A compiler cache may return the dependencies of another folder's build.
 export CCACHE_DISABLE=1
 
 rm -rf "${work:?}/headers"

@@ -60,7 +60,7 @@ void Client::complain(const std::string& what) {
   if (load_.problems++ < kMostComplaints) ADD_FAILURE() << what;
 }
 
-// An association that pairs the first of the host's settings ends with an exception where there is none.
+// An association that pairs the first of the host's settings ends with an exception if there is none.
 void Client::checkStatus(const Status& status, const std::string& request, std::initializer_list<int> codes) {
   if (status.ok() || std::find(codes.begin(), codes.end(), status.rc) != codes.end()) return;
   const bool lacksSettings = status.rc == kFailed && request.find("GenOrderedComponent") != std::string::npos &&
@@ -82,7 +82,7 @@ void Client::checkPath(const ObjectPath& path) {
   }
 }
 
-// The node's values are written whole. A file is not: a reader may find it when it is empty or half there.
+// The node's values are written as a whole. A file is not: a reader may find it empty or incomplete.
 void Client::checkTexts(const Instance& instance) {
   const bool isOfFile = instance.path.className == "ZORVA_DNSSettingData";
   for (const char* name : {"DomainName", "Hostname", "RequestedHostname"}) {
@@ -181,7 +181,7 @@ void Client::change() {
   if (className != kClasses[2]) set("DNSSuffixesToAppend", Value::textArray({writtenName(), writtenName()}));
   if (className != kClasses[0]) set("ConfigurationName", Value::text("configuration"));
   const Status status = load_.broker.modifyInstance(instance, std::nullopt);
-  // The interface of a setting may be gone by now.
+  // The interface of a setting may be removed by now.
   checkStatus(status, std::string("ModifyInstance of ") + className, {kFailed, kNotFound});
 }
 

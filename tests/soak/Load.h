@@ -1,4 +1,4 @@
-// Clients that ask a broker for everything that the twelve providers do, and look at every reply.
+// Clients that request everything that the twelve providers do from a broker, and check every response.
 #pragma once
 
 #include <array>
@@ -14,22 +14,22 @@
 
 namespace ZV::Test {
 
-// The texts that clients write: whole ones of these, or what was there before, is what readers may find.
+// The texts that clients write. Readers must find one of these as a whole, or the text from before.
 inline constexpr const char* kWrittenNames[] = {"alpha.example.org", "bravo.example.org", "gamma.example.org"};
 
-// What the clients of one load know together. All but the counters is set before they start.
+// The shared data of the clients of one load. All except the counters is set before they start.
 struct Load {
   Load(zorva::broker::Broker& asked, std::set<std::string> first) : broker(asked), namesAtFirst(std::move(first)) {}
 
   zorva::broker::Broker& broker;
-  std::set<std::string> namesAtFirst;  // domain and host names of the host before anybody wrote
+  std::set<std::string> namesAtFirst;  // domain and host names of the host before the first write
 
   std::atomic<std::size_t> reads = 0;
   std::atomic<std::size_t> traversals = 0;  // of associations
   std::atomic<std::size_t> changes = 0;
   std::atomic<std::size_t> methods = 0;
-  std::atomic<std::size_t> objects = 0;   // that came
-  std::atomic<std::size_t> problems = 0;  // replies that are not well-formed, each told as a failure of the test
+  std::atomic<std::size_t> objects = 0;   // received objects
+  std::atomic<std::size_t> problems = 0;  // responses that are not well-formed, each reported as a failure of the test
 };
 
 // One client; belongs to one thread.
@@ -37,7 +37,7 @@ class Client {
  public:
   Client(Load& load, unsigned int seed);
 
-  // Makes one request, of a kind that chance chooses, and checks its reply.
+  // Makes one random request and checks its response.
   void request();
 
   // The objects of a class, which are checked.
@@ -53,15 +53,15 @@ class Client {
   template <typename Number>
   Number chance(Number count);
   std::string writtenName();
-  // An object of one of the classes that was there a moment ago; no class where none is known.
+  // A recent object of one of the classes; no class if none is known.
   zorva::broker::ObjectPath anyObject();
 
-  // The sinks of requests: what they are given is checked and remembered.
+  // The sinks of requests: they check and remember their arguments.
   zorva::broker::InstanceSink instances();
   zorva::broker::PathSink paths();
   void checkPath(const zorva::broker::ObjectPath& path);
   void checkTexts(const zorva::broker::Instance& instance);
-  // codes: those that are right beside 0.
+  // codes: the other right codes besides 0.
   void checkStatus(const zorva::broker::Status& status, const std::string& request, std::initializer_list<int> codes);
   void complain(const std::string& what);
 

@@ -1,7 +1,7 @@
-// Eight clients at once ask for everything that the twelve providers do, through the broker and the shared libraries as
-// they are loaded, while the host changes under them: interfaces come and go, files are rewritten and replaced.
+// Eight clients at once request everything that the twelve providers do, through the broker and the loaded shared
+// libraries, while the host changes: interfaces come and go, files are rewritten and replaced.
 //
-// ZORVA_SOAK_SECONDS tells how long; one second where it is not set.
+// ZORVA_SOAK_SECONDS sets the duration; the default is one second.
 #include <gmock/gmock.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -31,7 +31,7 @@ using zorva::agent::testing::Interfaces;
 using zorva::agent::testing::TemporaryDirectory;
 
 constexpr unsigned int kClients = 8;
-constexpr seconds kLongestReply{30};  // under a sanitizer on a busy machine; what takes longer hangs
+constexpr seconds kLongestReply{30};  // under a sanitizer on a busy machine; a longer request hangs
 constexpr const char* kInside = "ZORVA_SOAK_INSIDE";
 
 seconds duration() {
@@ -52,12 +52,12 @@ class ChangingHost {
   ChangingHost(const ChangingHost&) = delete;
   ChangingHost& operator=(const ChangingHost&) = delete;
 
-  // Changes the interfaces; called over and over by one thread.
+  // Changes the interfaces; called repeatedly by one thread.
   virtual void changeInterfaces(unsigned int step) = 0;
-  // Leaves interfaces of these names.
+  // Leaves a fixed set of interfaces and returns their names.
   virtual std::set<std::string> settle() = 0;
 
-  // Rewrites, replaces, removes and makes interface files; called over and over by another thread.
+  // Rewrites, replaces, removes and makes interface files; called repeatedly by another thread.
   void changeFiles(unsigned int step) const {
     const std::string path = directory_ / ("ifcfg-nic" + std::to_string(step % 3));
     const std::string text = std::string("BOOTPROTO=dhcp\nHOSTNAME=") + kWrittenNames[step % 3] +
@@ -81,7 +81,7 @@ class ChangingHost {
   const TemporaryDirectory directory_;
 };
 
-// Interfaces out of a document, which is replaced.
+// Interfaces from a document, which is replaced.
 class DocumentHost : public ChangingHost {
  public:
   DocumentHost() : ChangingHost("file") { write(1); }
@@ -111,7 +111,7 @@ class DocumentHost : public ChangingHost {
   }
 };
 
-// Interfaces of the kernel, in a network of this process's own.
+// Interfaces of the kernel, in this process's own network.
 class NetworkHost : public ChangingHost {
  public:
   NetworkHost() : ChangingHost("host") { interfaces_.addBridge("nic0"); }
@@ -137,7 +137,7 @@ class NetworkHost : public ChangingHost {
     for (const char* name : {"nic1", "nic2", "moved"}) {
       try {
         interfaces_.remove(name);
-      } catch (const std::runtime_error&) {  // it is not there
+      } catch (const std::runtime_error&) {  // it does not exist
       }
     }
     return {"nic0"};
@@ -160,7 +160,7 @@ std::set<std::string> textsOfEndpoints(zorva::broker::Broker& broker, std::initi
   return texts;
 }
 
-// Calls the step over and over until the time is over.
+// Calls the step repeatedly until the time is over.
 template <typename Step>
 std::thread repeat(const std::atomic<bool>& isOver, milliseconds pause, Step step) {
   return std::thread([&isOver, pause, step] {
@@ -218,7 +218,7 @@ TEST(Soak, ClientsWhileADocumentChanges) {
   soak(host);
 }
 
-// Runs this test alone in a process that has a network of its own.
+// Runs only this test, in a process with its own network.
 bool succeedsInNewNetwork(const char* test) {
   const pid_t child = ::fork();
   if (child == 0) {

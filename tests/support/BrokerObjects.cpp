@@ -19,7 +19,7 @@ std::string nameOfOwn(const Object* object, const void* face) {
   return object->label + (object->hdl == nullptr ? "(no handle)" : "");
 }
 
-// The value in a pointer's target, which is only as large as its type.
+// The value that a pointer points to, which is only as large as its type.
 template <typename Number>
 Number readAs(const CMPIValue* value) {
   return *reinterpret_cast<const Number*>(value);
@@ -130,7 +130,7 @@ void fillNumber(CMPIData& data, const Value& value) {
   }
 }
 
-// Takes the handle from the object in the data. False where the data holds none.
+// Removes the handle of the object in the data. False if the data contain none.
 bool dropHandle(CMPIData& data) {
   if ((data.state & CMPI_nullValue) != 0) return false;
   if ((data.type & CMPI_ARRAY) != 0) {

@@ -1,4 +1,4 @@
-// The objects of the recording broker, and what the functions in their tables share.
+// The objects of the recording broker, and the functions that their tables share.
 #pragma once
 
 #include <cmpift.h>
@@ -14,7 +14,7 @@
 
 namespace ZV::Test {
 
-// What every object has beside its CMPI face. The face's hdl points at this, and is null in an object that was made
+// The part of every object besides its CMPI face. The face's hdl points at this, and is null in an object that was made
 // without a handle; the table finds the object by the face itself, which is a base of it.
 struct BrokerObject {
   virtual ~BrokerObject() = default;
@@ -60,7 +60,7 @@ struct ArgsObject : BrokerObject, CMPIArgs {
 };
 
 struct DateTimeObject : BrokerObject, CMPIDateTime {
-  std::string text;  // 25 characters in the form of DSP0004
+  std::string text;  // 25 characters in the format of DSP0004
 };
 
 // The tables of the objects, shared by all recording brokers.
@@ -75,14 +75,14 @@ struct ObjectTables {
   static CMPIArgsFT args;
   static CMPIDateTimeFT dateTime;
 
-  // Values in and out of the CMPI form. A value comes in as tables take it: a pointer to the variable that holds it,
-  // but for CMPI_chars the text itself. It goes out with texts as CMPI_string.
+  // Convert values from and to the CMPI form. A value comes in as tables take it: a pointer to the variable that has
+  // it, but for CMPI_chars the text itself. It goes out with texts as CMPI_string.
   static Value valueOf(const CMPIValue* value, CMPIType type);
   static CMPIData dataOf(RecordingBroker* broker, const Value& value);
   // The value as a call line shows it: a path or an instance by its name, all else by content.
   static std::string argument(const CMPIValue* value, CMPIType type);
 
-  // The object behind a face; null where it is null or another broker's.
+  // The object of a face; null if it is null or another broker's.
   static PathObject* own(const CMPIObjectPath* face);
   static InstanceObject* own(const CMPIInstance* face);
   static StringObject* own(const CMPIString* face);
@@ -92,12 +92,12 @@ struct ObjectTables {
   static ArgsObject* own(const CMPIArgs* face);
   static DateTimeObject* own(const CMPIDateTime* face);
 
-  // What an object holds, read through its own table where it is another broker's.
+  // The content of an object, read through its own table if it is another broker's.
   static Path pathOf(const CMPIObjectPath* face);
   static Instance instanceOf(const CMPIInstance* face);
   static std::string textOf(const CMPIString* face);
 
-  // An object's name in a call line; "null" for none, and a word where its handle is null.
+  // An object's name in a call line; "null" for none, and a special word if its handle is null.
   static std::string nameOf(const CMPIObjectPath* face);
   static std::string nameOf(const CMPIInstance* face);
   static std::string nameOf(const CMPIContext* face);
@@ -105,8 +105,8 @@ struct ObjectTables {
   static Path pathOfInstance(const InstanceObject& object);
 };
 
-// One call to an object or to the broker. Its constructor records it; its members end it as the failure that was asked
-// for has it.
+// One call to an object or to the broker. Its constructor records it; its members end it, with a failure if the test
+// asked for one.
 struct Call {
   // A call of an object's slot.
   template <typename Object>
@@ -114,20 +114,20 @@ struct Call {
       : Call(object->broker, name, object->label + (object->hdl == nullptr ? "(no handle)." : ".") + name, arguments) {
     hasHandle = object->hdl != nullptr;
   }
-  // A call of a slot that is named alone.
+  // A call of a slot that is shown without an object.
   Call(RecordingBroker* recorder, const char* name, const std::string& shownName, const std::string& arguments);
 
-  // Whether nothing may be done: the call fails by an rc alone, or the handle is null.
+  // Whether the call does nothing: it fails by an rc alone, or the handle is null.
   bool refused() const { return !hasHandle || failure.has_value(); }
-  // Ends a call that returns a status. Where it is refused the failure's, else what is given.
+  // Ends a call that returns a status: the failure's status if it is refused, else the argument.
   CMPIStatus status(CMPIrc rc = CMPI_RC_OK) const;
-  // End calls that give something and write a status. make makes the object; it is not asked where null is given.
+  // End calls that return something and write a status. make makes the object; it is not called if null is returned.
   template <typename Maker>
   auto give(const Maker& make, CMPIStatus* rc) const -> decltype(make());
-  // Gives what another provider serves, as the test has it fail.
+  // Returns what another provider serves, with the failures that the test asked for.
   template <typename Maker>
   auto giveServed(const ServedClass& served, const Maker& make, CMPIStatus* rc) const -> decltype(make());
-  // Gives null with a status, whatever failure was asked for.
+  // Returns null with a status, even if another failure was asked for.
   std::nullptr_t giveNull(CMPIStatus* rc, CMPIrc code) const;
   // added is added to the state of a value that is not null.
   CMPIData giveData(const Value& value, CMPIStatus* rc, CMPIValueState added = CMPI_goodValue) const;

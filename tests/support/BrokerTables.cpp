@@ -1,4 +1,4 @@
-// The function tables of the recording broker's objects: each function records its call, asks whether it shall fail,
+// The function tables of the recording broker's objects: each function records its call, checks whether it must fail,
 // and does its work.
 #include <cstring>
 
@@ -12,7 +12,7 @@ std::string plain(const char* text) { return text == nullptr ? std::string() : t
 
 std::string numberText(CMPICount number) { return std::to_string(number); }
 
-// The object behind the face that a function of its table was called with.
+// The object whose face is the first argument of a function of its table.
 template <typename Object, typename Face>
 Object* behind(const Face* face) {
   return static_cast<Object*>(const_cast<Face*>(face));
@@ -31,13 +31,13 @@ std::string nameAndValue(const char* name, const CMPIValue* value, CMPIType type
   return inQuotesOrNull(name) + ", " + ObjectTables::argument(value, type);
 }
 
-// Objects live as long as the broker, also when they were released.
+// Objects live as long as the broker, even after release.
 template <typename Face>
 CMPIStatus release(Face* face) {
   return Call(self(face), "release", "").status();
 }
 
-// The n-th of named values, and its name in a string of its own.
+// The n-th of named values, and its name in its own string.
 CMPIData giveNamed(const Call& call, const std::vector<NamedValue>& values, CMPICount index, const Missing& missing,
                    CMPIString** name, CMPIStatus* rc, CMPIString* (*makeName)(RecordingBroker*, const std::string&),
                    CMPIValueState added = CMPI_goodValue) {
@@ -338,7 +338,7 @@ CMPIArray* toArray(const CMPIEnumeration* face, CMPIStatus* rc) {
   return call.give([&] { return enumeration->broker->makeArray(all, {}); }, rc);
 }
 
-// --- the result; there is one for each request, so its calls are named alone
+// --- the result; there is one for each request, so its calls are shown without an object
 
 CMPIResult* resultClone(const CMPIResult* face, CMPIStatus* rc) {
   return Call(self(face), "clone", "").giveNull(rc, CMPI_RC_ERR_NOT_SUPPORTED);

@@ -1,5 +1,5 @@
-// CIM values, object paths and instances as plain records: what tests give to a provider and what they find that it
-// made. They hold no CMPI object, so they outlive the broker that they came from.
+// CIM values, object paths and instances as plain records: the input of tests to a provider, and its output. They
+// contain no CMPI object, so they outlive their broker.
 #pragma once
 
 #include <cmpidt.h>
@@ -20,20 +20,20 @@ namespace ZV::Test {
 struct Path;
 struct Instance;
 
-// One value with the CMPI type that it was given under. A value without content is null; a null array element is one,
-// too. Numbers and booleans are held at their full width.
+// One value with its CMPI type. A value without content is null; a null array element is one, too. Numbers and booleans
+// have their full width.
 struct Value {
   using Content = std::variant<std::monostate, std::uint64_t, std::int64_t, double, std::string, std::vector<Value>,
                                std::shared_ptr<const Path>, std::shared_ptr<const Instance>>;
 
   CMPIType type = CMPI_null;
-  CMPIValueState state = CMPI_goodValue;  // a null value has CMPI_nullValue, or what it was made with
+  CMPIValueState state = CMPI_goodValue;  // a null value has CMPI_nullValue, or the state it was made with
   Content content;
 
   bool isNull() const { return std::holds_alternative<std::monostate>(content); }
 
-  // The content as one kind of C++ value; an empty text, 0, no elements, a path without class where it is of another
-  // kind, so that a comparison in a test fails and nothing throws.
+  // The content as one kind of C++ value. If it is of another kind: an empty text, 0, no elements, a path without
+  // class; so that a comparison in a test fails and nothing throws.
   std::string text() const;
   std::uint64_t number() const;
   std::vector<Value> elements() const;
@@ -43,9 +43,9 @@ struct Value {
 
 using NamedValue = std::pair<std::string, Value>;
 
-// Names match without regard to case, as CIM has it. Null where there is no such name.
+// Names match without regard to case, as in CIM. Null if there is no such name.
 const Value* findValue(const std::vector<NamedValue>& values, std::string_view name);
-// Puts the value in the place of one of the same name, or at the end.
+// Replaces the value of that name, or appends it.
 void putValue(std::vector<NamedValue>& values, std::string_view name, Value value);
 bool sameName(std::string_view left, std::string_view right);
 
@@ -58,13 +58,13 @@ struct Path {
   Path() = default;
   explicit Path(std::string name, std::string space = "root/cimv2");
 
-  // The same path with a key more, or with another value for it. A text is given as CMPI_string, as servers do.
+  // The same path with one more key, or with another value for it. A text becomes CMPI_string, as in servers.
   Path key(std::string_view name, Value value) const;
   Path key(std::string_view name, const char* text) const;
   Path on(std::string hostName) const;
   Path in(std::string space) const;
 
-  // The value of a key; null where the path lacks it.
+  // The value of a key; null if the path lacks it.
   Value operator[](std::string_view name) const;
 };
 
@@ -75,11 +75,11 @@ struct Instance {
   Instance() = default;
   explicit Instance(std::string className, std::string space = "root/cimv2");
 
-  // The same instance with a property more, or with another value for it. A text is given as CMPI_string.
+  // The same instance with one more property, or with another value for it. A text becomes CMPI_string.
   Instance with(std::string_view name, Value value) const;
   Instance with(std::string_view name, const char* text) const;
 
-  // The value of a property; null where the instance lacks it.
+  // The value of a property; null if the instance lacks it.
   Value operator[](std::string_view name) const;
   bool has(std::string_view name) const { return findValue(properties, name) != nullptr; }
   std::vector<std::string> names() const;  // of the properties, in order
@@ -90,8 +90,8 @@ bool operator==(const Path& left, const Path& right);
 bool operator==(const Instance& left, const Instance& right);
 
 // Values by CMPI type.
-Value chars(std::string text);  // CMPI_chars: what a provider sets a text as
-Value text(std::string text);   // CMPI_string: what a broker hands out
+Value chars(std::string text);  // CMPI_chars: the type with which a provider sets a text
+Value text(std::string text);   // CMPI_string: the type that a broker returns
 Value uint8(std::uint8_t number);
 Value uint16(std::uint16_t number);
 Value uint32(std::uint32_t number);
@@ -108,14 +108,14 @@ Value null(CMPIType type = CMPI_null, CMPIValueState state = CMPI_nullValue);
 std::string describe(const Value& value);
 // A path as `ZORVA_X.Name="eth0",SystemName="host1"`, with keys in order and a reference in parentheses.
 std::string describe(const Path& path);
-// The same with where it lies in front: `//host1/root/cimv2:ZORVA_X.Name="eth0"`.
+// The same with host and namespace in front: `//host1/root/cimv2:ZORVA_X.Name="eth0"`.
 std::string describeWhole(const Path& path);
 // An instance as its class and one line `  Name = chars "eth0"` for each property, in order.
 std::string describe(const Instance& instance);
 std::string nameOfType(CMPIType type);
 
 // The text in double quotes with control characters, quotes and backslashes escaped; long texts are cut and their
-// length named. Null is the word null.
+// length is written. Null is the word null.
 std::string inQuotes(std::string_view text);
 std::string inQuotesOrNull(const char* text);
 // A list of names that ends with a null, as `{"a", "b"}`; the word null for none.

@@ -1,4 +1,4 @@
-// The order of everything that is recorded: calls to a broker and lines of the log fall into one sequence.
+// The order of everything that is recorded: calls to a broker and log lines form one sequence.
 #pragma once
 
 #include <atomic>

@@ -11,7 +11,7 @@ const CMPIContext* contextOf(RecordingBroker& broker) { return broker.makeContex
 
 CMPIBoolean flag(bool value) { return static_cast<CMPIBoolean>(value); }
 
-// Runs one operation with a context, a result and a path of its own, and gathers what it left.
+// Runs one operation with its own context, result and path, and collects the results.
 template <typename Operation>
 Outcome run(RecordingBroker& broker, const Path& path, const Operation& operation) {
   broker.beginRequest();

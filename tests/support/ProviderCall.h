@@ -1,4 +1,4 @@
-// Calls a provider through its function tables, as a CIM server would, and hands back all that came of it.
+// Calls a provider through its function tables, as a CIM server would, and returns all results.
 #pragma once
 
 #include <cmpift.h>
@@ -16,33 +16,33 @@
 
 namespace ZV::Test {
 
-// What one operation left behind.
+// The results of one operation.
 struct Outcome {
   CMPIrc rc = CMPI_RC_OK;
   std::optional<std::string> message;  // of the status
   Results result;
   std::vector<NamedValue> out;  // output arguments of a method
-  Calls calls;                  // what the provider called in the broker and its objects
-  LogLines lines;               // the log pairs, one line each, where a RecordingLogger was there
+  Calls calls;                  // the provider's calls to the broker and its objects
+  LogLines lines;               // the log pairs, one line each, if a RecordingLogger was active
 
   const std::vector<Instance>& instances() const { return result.instances; }
   const std::vector<Path>& paths() const { return result.paths; }
   bool done() const { return result.done(); }
   std::vector<std::string> errors() const { return lines.errors(); }
 
-  // Whether the operation's entry and exit marks are there: the last line of the one, the first of the other.
+  // Whether the operation's entry and exit marks are there: the last line of the entry, the first of the exit.
   bool markedEntry() const;
   bool markedExit() const;
 
-  // The calls that make, change or hand out something, and the log lines, in the one order in which they happened; a
-  // log line as `log 6000 MESSAGE No ObjectPath Found`.
+  // The calls that make, change or return something, and the log lines, in the order in which they happened; a log line
+  // as `log 6000 MESSAGE No ObjectPath Found`.
   std::vector<std::string> story() const;
 };
 
 std::ostream& operator<<(std::ostream& out, const Outcome& outcome);
 const char* nameOf(CMPIrc rc);
 
-// A property list: null, which asks for everything, or names; {} is a list of no names.
+// A property list: null, which requests everything, or names; {} is a list of no names.
 class PropertyList {
  public:
   PropertyList(std::nullptr_t) {}
@@ -57,7 +57,7 @@ class PropertyList {
   std::vector<const char*> pointers_;
 };
 
-// The arguments of an association operation besides the path; null where left out.
+// The arguments of an association operation besides the path; null if left out.
 struct AssociationQuery {
   const char* assocClass = nullptr;
   const char* resultClass = nullptr;
@@ -67,8 +67,8 @@ struct AssociationQuery {
 };
 
 // Each provider is made by its create function and called with objects of the broker that are named in call lines as
-// context, ref (the operation's path), instance, in and out. What the provider throws flies on to the test. Each
-// operation begins a new request of the broker (RecordingBroker::beginRequest).
+// context, ref (the operation's path), instance, in and out. Exceptions of the provider reach the test. Each operation
+// begins a new request of the broker (RecordingBroker::beginRequest).
 
 class InstanceProvider {
  public:

@@ -12,7 +12,7 @@ using ::testing::ElementsAre;
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 
-// A provider of one class that answers each operation in its own recognisable way.
+// A provider of one class that answers each operation in a different, recognizable way.
 namespace sample {
 
 const CMPIBroker* broker = nullptr;

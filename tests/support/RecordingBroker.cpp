@@ -59,7 +59,7 @@ bool isAmong(const Names& names, const std::string& name) {
 
 RecordingBroker* behind(const CMPIBroker* face) { return static_cast<RecordingBroker*>(face->hdl); }
 
-// A slot that this broker has no use for: it says so by its status, where it has one, and gives null.
+// A slot that this broker does not implement: it says so by its status, if it has one, and returns null.
 CMPIStatus lastStatusOf() { return {CMPI_RC_ERR_NOT_SUPPORTED, nullptr}; }
 
 template <typename Last>
@@ -158,7 +158,7 @@ void* reallocate(const CMPIBroker*, void* memory, std::size_t size) { return std
 char* duplicate(const CMPIBroker*, const char* text) { return ::strdup(text); }
 void deallocate(const CMPIBroker*, void* memory) { std::free(memory); }
 
-// Freeing an object is written down; the object itself lives on as long as the broker.
+// Freeing an object is recorded; the object itself lives as long as the broker.
 template <typename Face>
 void freeObject(const CMPIBroker* face, Face*) {
   Call(behind(face), "free", "free", "").status();
@@ -449,7 +449,7 @@ CMPIInstance* BrokerEncapsulation::newInstance(const CMPIBroker* face, const CMP
   RecordingBroker* broker = behind(face);
   const Call call(broker, "newInstance", "newInstance", ObjectTables::nameOf(path));
   if (path == nullptr || path->hdl == nullptr) return call.giveNull(rc, CMPI_RC_ERR_INVALID_PARAMETER);
-  // The host is not taken over: what a provider wants in a path of the instance it has to set there.
+  // The host is not copied: a provider that needs it in a path of the instance has to set it there.
   Instance fresh;
   fresh.path = ObjectTables::pathOf(path).on("");
   return call.give([&] { return broker->addInstance(fresh); }, rc);
@@ -552,7 +552,7 @@ CMPIBrokerEncFT BrokerEncapsulation::table = [] {
 
 namespace {
 
-// A provider hands on the context of its own operation, so a line names the context only where it is another.
+// A provider passes the context of its own operation, so a line shows the context only if it is another one.
 std::string upCallArguments(const CMPIContext* context, const CMPIObjectPath* path) {
   const std::string name = ObjectTables::nameOf(context);
   return ObjectTables::nameOf(path) + (name == "context" ? "" : ", context " + name);

@@ -1,4 +1,4 @@
-// A CMPI broker that writes down every call that is made to it and to its objects, and fails where a test asks it to.
+// A CMPI broker that records every call to it and to its objects, and fails where a test asks it to.
 #pragma once
 
 #include <cmpift.h>
@@ -19,14 +19,14 @@
 
 namespace ZV::Test {
 
-// How a call into the broker fails. What a call cannot do it does as near as it can: a call that only returns a status
-// fails by its rc in every mode, a count or a flag that is null is 0, a text without a handle is null.
+// How a call into the broker fails. A call that cannot fail in a mode does the nearest: a call that only returns a
+// status fails by its rc in every mode, a count or a flag that is null is 0, a text without a handle is null.
 enum class Mode {
   SetRc,       // rc CMPI_RC_ERR_FAILED with a message, yet the object is good
   ReturnNull,  // rc CMPI_RC_OK, null
   NullHandle,  // rc CMPI_RC_OK, an object whose hdl is null
   RcAndNull,   // rc CMPI_RC_ERR_FAILED with a message, and null
-  Throw,       // an InjectedFailure flies
+  Throw,       // throws an InjectedFailure
 };
 inline constexpr Mode kAllStatusModes[] = {Mode::SetRc, Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull};
 const char* nameOf(Mode mode);
@@ -36,7 +36,7 @@ class InjectedFailure : public std::runtime_error {
   using std::runtime_error::runtime_error;
 };
 
-// One call: the name of the slot, and the whole of it as a line.
+// One call: the name of the slot, and the complete line.
 struct RecordedCall {
   std::string name;
   std::string line;
@@ -50,8 +50,8 @@ class Calls : public std::vector<RecordedCall> {
 
   // All lines.
   std::vector<std::string> lines() const;
-  // Lines of the calls that make, change or hand out something: what only reads an object or a text is left out
-  // (getKey, getCharPtr, getNameSpace, hasNext and their like).
+  // Lines of the calls that make, change or return something: calls that only read an object or a text are left out
+  // (getKey, getCharPtr, getNameSpace, hasNext and the like).
   std::vector<std::string> steps() const;
   // Lines of the calls of these names.
   std::vector<std::string> only(std::initializer_list<std::string_view> names) const;
@@ -60,27 +60,27 @@ class Calls : public std::vector<RecordedCall> {
   std::size_t count(std::string_view name) const;
 };
 
-// What the result that a provider was given has received.
+// What a provider has put into its result.
 struct Results {
-  std::vector<Instance> instances;  // without those that were null
-  std::vector<Path> paths;          // likewise
+  std::vector<Instance> instances;  // without null ones
+  std::vector<Path> paths;          // without null ones
   std::vector<Value> data;
   int doneCount = 0;
   bool done() const { return doneCount != 0; }
 };
 
-// How a broker answers for a name that an object does not have.
+// A broker's answer for a name that an object does not have.
 struct Missing {
   CMPIrc rc;
   CMPIValueState state;
 };
 
-// What the broker has of a class that another provider serves.
+// The broker's objects of a class that another provider serves.
 struct ServedClass {
   std::vector<Instance> instances;
   CMPIrc rc = CMPI_RC_OK;        // the status of each enumeration; not OK without instances gives a null enumeration
   bool nullEnumeration = false;  // null, whatever the rc is
-  bool throws = false;           // an InjectedFailure flies
+  bool throws = false;           // throws an InjectedFailure
 };
 
 struct Call;
@@ -96,7 +96,7 @@ struct ArgsObject;
 struct DateTimeObject;
 
 // Objects that the broker makes for a provider are called OP1, OP2 for object paths, and likewise I for instances, A
-// for arrays, E for enumerations, AR for arguments, C for contexts, DT for dates; a string is called by its text.
+// for arrays, E for enumerations, AR for arguments, C for contexts, DT for dates; a string has its text as name.
 // Objects that a test makes are called what the test calls them. The broker has no schema: an instance's path has the
 // keys that setPropertyFilter named, or else those of a small table of classes (setKeysOfClass). Names match without
 // regard to case. A null status pointer is tolerated everywhere. A handle that is null makes a call answer
@@ -113,7 +113,7 @@ class RecordingBroker {
 
   const CMPIBroker* cmpi() const { return &broker_; }
 
-  // Objects for a provider to be called with. They are not recorded as calls.
+  // Makes objects for a call of a provider. They are not recorded as calls.
   CMPIObjectPath* make(const Path& path, const std::string& label = "path");
   CMPIInstance* make(const Instance& instance, const std::string& label = "instance");
   CMPIString* makeString(const std::string& text);
@@ -123,7 +123,8 @@ class RecordingBroker {
   CMPIResult* makeResult(const std::string& label = "result");
   CMPIData makeData(const Value& value);
 
-  // What an object of any RecordingBroker holds now. Not recorded. A null object or handle gives an empty record.
+  // The current content of an object of any RecordingBroker. Not recorded. A null object or handle gives an empty
+  // record.
   static Path read(const CMPIObjectPath* path);
   static Instance read(const CMPIInstance* instance);
   static std::vector<NamedValue> read(const CMPIArgs* arguments);
@@ -134,19 +135,19 @@ class RecordingBroker {
   void setKeysOfClass(const std::string& className, std::vector<std::string> names);
   const std::vector<std::string>& keysOfClass(const std::string& className) const;
 
-  // The class as another provider serves it, to be filled in by the test. A class that was never named here answers
+  // The class as another provider serves it, to be filled by the test. A class that was never named here answers
   // CMPI_RC_ERR_INVALID_CLASS and null.
   ServedClass& serve(const std::string& className, std::vector<Instance> instances = {});
 
   Missing missingKey{CMPI_RC_ERR_NOT_FOUND, CMPI_notFound};
   Missing missingProperty{CMPI_RC_ERR_NO_SUCH_PROPERTY, CMPI_notFound};
   Missing missingArgument{CMPI_RC_ERR_NO_SUCH_PROPERTY, CMPI_notFound};
-  bool keepsLines = true;  // false: calls are counted and not written down, for long runs
+  bool keepsLines = true;  // false: calls are counted but not recorded, for long runs
 
-  // What is added to the state of a good value, by the call that gives it. Some servers mark keys with CMPI_keyValue,
-  // others leave CMPI_nullValue there.
+  // Added to the state of a good value by the call that returns it. Some servers mark keys with CMPI_keyValue, others
+  // leave CMPI_nullValue there.
   CMPIValueState stateOfKeys = CMPI_goodValue;
-  CMPIValueState stateOfNexts = CMPI_goodValue;  // of getNext
+  CMPIValueState stateOfNexts = CMPI_goodValue;  // for getNext
   CMPIValueState stateOfElements = CMPI_goodValue;
   CMPIValueState stateOfArguments = CMPI_goodValue;
   void addToAllStates(CMPIValueState state);
@@ -162,10 +163,11 @@ class RecordingBroker {
   std::size_t callCount() const;  // since startOver
   std::size_t callsOf(const std::string& name) const { return calls().count(name); }
 
-  // Forgets the calls and numbers new objects from 1 again, as a request begins. Failures that were asked for stay.
+  // Drops the recorded calls and numbers new objects from 1 again, as at the beginning of a request. Requested failures
+  // stay.
   void beginRequest();
 
-  // Forgets calls and failures and numbers new objects from 1 again; objects stay as they are.
+  // Drops recorded calls and failures and numbers new objects from 1 again; objects are not changed.
   void startOver();
 
   // Ends all objects that were made after mark() gave this number.
@@ -190,7 +192,7 @@ class RecordingBroker {
   ArgsObject* addArgs(std::vector<NamedValue> arguments, const std::string& label = {});
   DateTimeObject* addDateTime(std::string text);
 
-  // Counts and writes down one call and says how it shall fail. Throws InjectedFailure where that is the way.
+  // Counts and records one call and says how it must fail. Throws InjectedFailure if it must throw.
   std::optional<Mode> record(const char* name, std::string line);
 
   CMPIBroker broker_;
@@ -207,14 +209,14 @@ class RecordingBroker {
   std::map<std::string, ServedClass> served_;
 };
 
-// Runs the operation over and over, with the broker failing at its 1st call, its 2nd, and so on in each of the modes,
-// until the operation makes no call more. The operation makes its request and checks how it ended. Returns the number
-// of failures that were tried.
+// Repeats the operation with the broker failing at its 1st call, its 2nd, and so on in each of the modes, until the
+// operation makes no further call. The operation makes its request and checks how it ended. Returns the number of
+// failures that were tried.
 std::size_t forEachFailure(RecordingBroker& broker, const std::function<void(std::size_t n, Mode mode)>& operation,
                            std::initializer_list<Mode> modes = {Mode::SetRc, Mode::ReturnNull, Mode::NullHandle,
                                                                 Mode::RcAndNull});
 
-// What a provider made, read and described.
+// An object that a provider made, read and described.
 std::string describe(const CMPIObjectPath* path);
 std::string describe(const CMPIInstance* instance);
 

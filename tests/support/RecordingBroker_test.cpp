@@ -320,7 +320,7 @@ TEST(RecordingBroker, EachFailureIsTriedUntilTheOperationMakesNoCallMore) {
   EXPECT_EQ(0U, broker.mark());
 }
 
-// Objects with tables of their own, as another implementation of a broker has them.
+// Objects with their own tables, as another implementation of a broker has them.
 TEST(RecordingBroker, ObjectsOfAnotherKindOfBrokerAreReadThroughTheirTables) {
   RecordingBroker broker;
   CMPIObjectPathFT pathTable = ObjectTables::path;

@@ -23,8 +23,8 @@ constexpr std::string_view kParameters = ",Parameters List: ";
 
 bool startsWith(const std::string& text, std::string_view start) { return text.compare(0, start.size(), start) == 0; }
 
-// The text between two marks, the first found from the start and the second behind it; to the end where the second is
-// empty or missing, since a long line may have been cut.
+// The text between two marks: the first from the start, the second after it. If the second is empty or missing, the
+// text to the end, because a long line may have been cut.
 std::string between(const std::string& text, std::string_view before, std::string_view after) {
   const std::size_t start = text.find(before);
   if (start == std::string::npos) return {};
@@ -33,7 +33,7 @@ std::string between(const std::string& text, std::string_view before, std::strin
   return text.substr(from, end == std::string::npos ? std::string::npos : end - from);
 }
 
-// A variable's value may hold anything, so its end is searched from the line's end.
+// A variable's value may contain anything, so its end is searched from the line's end.
 std::string variableValue(const std::string& text) {
   constexpr std::string_view kBefore = "' has Value '";
   const std::size_t start = text.find(kBefore);

@@ -66,8 +66,7 @@ void setProperties(TreeBuilder& builder, std::size_t node, const std::string& na
   }
 }
 
-// The agent as in a new process of a program that catches what a provider throws; a logger that records goes on
-// recording.
+// The agent as in a new process of a program that catches exceptions of a provider; an active logger goes on recording.
 void forgetWorld() {
   zorva::agent::reset();
   zorva::agent::askForExceptions();
@@ -89,7 +88,7 @@ World::World() : dataDir_(makeDirectory()) {}
 
 World::~World() {
   if (installed_) forgetWorld();
-  std::error_code ignored;  // a test may have taken the directory away itself
+  std::error_code ignored;  // a test may have removed the directory itself
   std::filesystem::remove_all(dataDir_, ignored);
 }
 

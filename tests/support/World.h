@@ -1,4 +1,4 @@
-// A host for a test to run on: an instrumentation tree written in a line or two, and a data directory of its own.
+// A host for a test: an instrumentation tree written in a line or two, and its own data directory.
 #pragma once
 
 #include <cstddef>
@@ -15,7 +15,7 @@
 
 namespace ZV::Test {
 
-// A list that may be absent: {"a", "b"} is there, and so is noTexts(); left out it is absent.
+// A list that may be absent: {"a", "b"} and noTexts() are present; if left out it is absent.
 class OptionalTexts {
  public:
   OptionalTexts() = default;
@@ -29,8 +29,8 @@ class OptionalTexts {
 };
 inline OptionalTexts noTexts() { return std::vector<std::string>(); }
 
-// The properties of an interface's configuration. What is left out is absent from the node; but the name is that of
-// the interface, unless isUnnamed.
+// The properties of an interface's configuration. Properties that are left out are absent from the node, except the
+// name, which is that of the interface, unless isUnnamed.
 struct NicProperties {
   std::optional<std::string> name = {};
   std::optional<std::string> hostName = {};
@@ -46,13 +46,14 @@ struct NicProperties {
 // An interface that has everything: host1 in example.org, one suffix, one server, up with carrier.
 NicProperties usualNic();
 
-// Written once and installed, it is what the agent of this process sees, until the next one is installed or it ends:
+// Once installed, it is the host that the agent of this process sees, until the next one is installed or it is
+// destroyed:
 //
 //   World world;
 //   world.host("host1").nic("eth0", {.domain = "example.org", .servers = {"192.0.2.53"}}).bmc().nic("bmc0").install();
 //   world.file("eth0", "DOMAINNAME=lab.example.org\n");
 //
-// At the end the agent forgets everything but an active RecordingLogger, and the data directory goes. One at a time.
+// The destructor resets the agent, except for an active RecordingLogger, and removes the data directory. One at a time.
 class World {
  public:
   // A host without nodes, named host1, with an empty data directory.
@@ -61,29 +62,29 @@ class World {
   World(const World&) = delete;
   World& operator=(const World&) = delete;
 
-  // A system's node; interfaces named after it belong to it. host also names the managed system.
+  // A system's node; interfaces that are added after it belong to it. host also names the managed system.
   World& host(const std::string& name = "host1", const std::string& description = "Computer");
   World& bmc();
   World& system(const std::string& nodeName, const std::string& description);
 
-  // An interface of the latest system, which is a plain host where none was named. Several may have one name.
+  // An interface of the latest system, which is a plain host if none was named. Several may have one name.
   World& nic(const std::string& name, const NicProperties& properties = {});
 
-  // Makes this what the agent sees. Called again after more was added, it replaces the tree.
+  // Makes this the host that the agent sees. Called again after changes, it replaces the tree.
   World& install();
-  // The agent finds a source of trees that throws a std::runtime_error with this text.
+  // Installs a source of trees that throws a std::runtime_error with this text.
   World& installUnreadable(const std::string& reason = "the tree cannot be read");
 
   std::shared_ptr<const zorva::agent::TreeSnapshot> tree() const;
-  // What the node of the n-th interface holds now, through the agent: values that were set included. Empty or no
-  // value where the property is absent.
+  // The current properties of the n-th interface's node, read through the agent, including values that were set. Empty
+  // or no value if the property is absent.
   std::optional<std::string> text(std::size_t nic, zorva::agent::PropertyNumber property) const;
   std::optional<std::vector<std::string>> list(std::size_t nic, zorva::agent::PropertyNumber property) const;
 
   const std::string& dataDir() const { return dataDir_; }  // ends in a slash
   std::string filePath(const std::string& nic) const { return dataDir_ + "ifcfg-" + nic; }
   World& file(const std::string& nic, const std::string& content);
-  // The file's bytes; no value where there is none.
+  // The file's bytes; no value if there is none.
   std::optional<std::string> fileContent(const std::string& nic) const;
 
  private:
@@ -110,8 +111,8 @@ class World {
 // What a failing tree throws: an exception derived from std::exception, or an int.
 enum class Thrown { StdException, Int };
 
-// Makes one call of the tree's cursors fail, the n-th from now on, counted from 1, or counts them where n is 0. One at
-// a time.
+// Makes one call of the tree's cursors fail, the n-th from now on, counted from 1, or only counts them if n is 0. One
+// at a time.
 class FailingTree : private zorva::agent::TreeCallHook {
  public:
   explicit FailingTree(std::size_t n = 0, Thrown thrown = Thrown::StdException);
@@ -132,8 +133,8 @@ class FailingTree : private zorva::agent::TreeCallHook {
   std::vector<zorva::agent::TreeCall> calls_;
 };
 
-// Runs the operation with the tree failing at its 1st call, its 2nd, and so on, in both ways, until the operation makes
-// no call more. What flies out of the operation is the operation's to catch. Returns the number of failures tried.
+// Repeats the operation with the tree failing at its 1st call, its 2nd, and so on, in both ways, until the operation
+// makes no further call. The operation must catch its exceptions. Returns the number of failures tried.
 std::size_t forEachTreeFailure(const std::function<void(std::size_t n, Thrown thrown)>& operation);
 
 }  // namespace ZV::Test
