@@ -1,4 +1,4 @@
-# What every target is built with: the language level, warnings as errors, hidden symbols, sanitizers, output folders.
+# Common to every target: the language level, warnings as errors, hidden symbols, sanitizers, output folders.
 
 set(CMAKE_CXX_STANDARD 20)
 set(CMAKE_CXX_STANDARD_REQUIRED ON)
@@ -17,7 +17,7 @@ include(GNUInstallDirs)
 
 find_program(ZORVA_CCACHE ccache)
 if(ZORVA_CCACHE)
-  # What it needs to know of precompiled headers: that they are younger than the build and that no macro hides in them.
+  # ccache must know about precompiled headers that they are newer than the build and that no macro is hidden in them.
   set(ZORVA_CCACHE_LAUNCHER ${CMAKE_COMMAND} -E env
     CCACHE_SLOPPINESS=pch_defines,time_macros,include_file_mtime,include_file_ctime ${ZORVA_CCACHE})
   set(CMAKE_CXX_COMPILER_LAUNCHER ${ZORVA_CCACHE_LAUNCHER})
@@ -25,17 +25,17 @@ if(ZORVA_CCACHE)
   add_compile_options("$<$<COMPILE_LANG_AND_ID:CXX,GNU>:-fpch-preprocess>")
 endif()
 
-# Which of CMPI's platform symbols holds here; the headers refuse to compile without one.
+# The platform symbol of CMPI; the headers refuse to compile without one.
 add_compile_definitions(CMPI_PLATFORM_LINUX_GENERIC_GNU)
 
 add_compile_options(
   -Wall -Wextra -Wpedantic -Wconversion -Wshadow -Werror
   -ffile-prefix-map=${CMAKE_SOURCE_DIR}/=)
-# Optimising, g++ 12 sees overlapping copies in the concatenation of std::string (GCC bug 105651) and reads of what was
-# never set in copies of std::variant (GCC bug 105562), where there are none.
+# When it optimizes, g++ 12 warns of overlapping copies in the concatenation of std::string (GCC bug 105651) and of
+# reads of uninitialized values in copies of std::variant (GCC bug 105562), where there are none.
 add_compile_options(
   "$<$<AND:$<CXX_COMPILER_ID:GNU>,$<VERSION_LESS:$<CXX_COMPILER_VERSION>,13>>:-Wno-restrict;-Wno-maybe-uninitialized>")
-# Memory is there: without collecting garbage g++ takes a tenth less time for a test.
+# There is enough memory: without garbage collection g++ needs a tenth less time for a test.
 add_compile_options("$<$<COMPILE_LANG_AND_ID:CXX,GNU>:SHELL:--param ggc-min-heapsize=524288>")
 add_link_options(-Wl,--as-needed)
 
@@ -49,38 +49,38 @@ elseif(NOT ZORVA_SANITIZE STREQUAL "")
   message(FATAL_ERROR "ZORVA_SANITIZE is '${ZORVA_SANITIZE}'; it takes address, thread or nothing")
 endif()
 
-# What the fuzzer steers by.
+# The coverage that guides the fuzzer.
 if(ZORVA_FUZZ)
   add_compile_options(-fsanitize=fuzzer-no-link)
 endif()
 
 if(ZORVA_COVERAGE)
-  # Threads count alike: without atomic counters some would come out below 0.
-  # Sources are named in full here, for the reports to find them, whatever the compiler's macros say.
+  # Atomic counters, because with threads some counts would otherwise be below 0. Full source paths, so that the reports
+  # find the files, whatever the compiler's macros say.
   add_compile_options(--coverage -fprofile-abs-path -fprofile-update=atomic
     -fprofile-prefix-map=${CMAKE_SOURCE_DIR}/=${CMAKE_SOURCE_DIR}/)
   add_link_options(--coverage)
 endif()
 
-# zorva_limit_exports(TARGET FILE): only the symbols that FILE lists as global leave the shared library TARGET. A symbol
-# that stays inside cannot be bound from elsewhere, so the library can be unloaded and two of them do not mix.
+# zorva_limit_exports(TARGET FILE): the shared library TARGET exports only the symbols that FILE lists as global. A
+# symbol inside cannot be bound from outside, so the library can be unloaded, and two of them do not mix.
 function(zorva_limit_exports target file)
   target_link_options(${target} PRIVATE -Wl,--version-script=${CMAKE_CURRENT_SOURCE_DIR}/${file})
   set_property(TARGET ${target} APPEND PROPERTY LINK_DEPENDS ${CMAKE_CURRENT_SOURCE_DIR}/${file})
   target_compile_options(${target} PRIVATE $<$<CXX_COMPILER_ID:GNU>:-fno-gnu-unique>)
 endfunction()
 
-# zorva_install_library(TARGET): installs a shared library, which finds the others beside itself.
+# zorva_install_library(TARGET): installs a shared library, which finds the other libraries in its own directory.
 function(zorva_install_library target)
   set_target_properties(${target} PROPERTIES INSTALL_RPATH "$ORIGIN")
   install(TARGETS ${target} LIBRARY NAMELINK_SKIP)
 endfunction()
 
-# Headers that many sources include are compiled once for all of them. A build without tests is made without, so that it
-# shows whether each source includes what it uses.
+# Headers that many sources include are compiled once for all of them. A build without tests does without, so it shows
+# whether each source includes all that it uses.
 option(ZORVA_PRECOMPILE "Precompile the standard library's and GoogleTest's headers" ${ZORVA_BUILD_TESTS})
 
-# zorva_precompile_headers(TARGETS...): their sources see the standard library's headers precompiled.
+# zorva_precompile_headers(TARGETS...): their sources use precompiled headers of the standard library.
 function(zorva_precompile_headers)
   if(ZORVA_PRECOMPILE)
     foreach(target ${ARGN})
@@ -89,13 +89,13 @@ function(zorva_precompile_headers)
   endif()
 endfunction()
 
-# Tests say where they failed by themselves, so that their debug information is file and line for a stack trace; it
-# costs a sixth of their compilation to have local variables as well. Position-independent like the libraries, since a
-# precompiled header serves only one kind of code.
+# Tests report where they failed, so their debug information is only file and line for a stack trace; local variables
+# would cost a sixth of their compilation. Position-independent like the libraries, because a precompiled header serves
+# only one kind of code.
 set(ZORVA_TEST_DEBUG_INFO "-g1" CACHE STRING "Debug information of the tests; -g to step through one in a debugger")
 set(ZORVA_TEST_OPTIONS -fPIC "$<$<CONFIG:Debug>:${ZORVA_TEST_DEBUG_INFO}>")
 
-# zorva_build_as_test(TARGET): compiles a program or a library of tests as all of them are.
+# zorva_build_as_test(TARGET): compiles a program or a library like all tests.
 function(zorva_build_as_test target)
   target_link_libraries(${target} PUBLIC GTest::gmock)
   target_compile_options(${target} PRIVATE ${ZORVA_TEST_OPTIONS})

@@ -1,1 +1,1 @@
-// The library that precompiled headers belong to needs a source.
+// The library that owns the precompiled headers needs a source.

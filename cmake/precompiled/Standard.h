@@ -1,4 +1,4 @@
-// What most sources of the products include, precompiled where the tests are built too.
+// The headers that most sources of the products include; precompiled in builds with tests.
 #pragma once
 
 #include <algorithm>

@@ -1,4 +1,5 @@
-// What most tests include, precompiled. What each of them would instantiate again is instantiated once, in Tests.cpp.
+// The headers that most tests include, precompiled. Templates that each test would instantiate again are instantiated
+// once, in Tests.cpp.
 #pragma once
 
 #include <gmock/gmock.h>
