@@ -165,13 +165,13 @@ TEST_F(BrokerTest, EnumeratesTheServedClassesBelowAnAbstractOne) {
   EXPECT_THAT(lines(), Contains(StartsWith("T_Absent is left out: there is no provider library")));
 }
 
-TEST_F(BrokerTest, FailsWhereTheLibraryOfTheClassItselfIsMissing) {
+TEST_F(BrokerTest, FailsIfTheLibraryOfTheClassItselfIsMissing) {
   EXPECT_THAT(names("T_Absent"), IsEmpty());
   EXPECT_EQ(status_.rc, 1);
   EXPECT_THAT(status_.message, HasSubstr("libno-such-library.so.1"));
 }
 
-TEST_F(BrokerTest, FailsWhereTheLibraryLacksTheCreateFunction) {
+TEST_F(BrokerTest, FailsIfTheLibraryLacksTheCreateFunction) {
   names("T_Two");
   EXPECT_EQ(status_.rc, 1);
   EXPECT_THAT(status_.message, HasSubstr("has no function Missing_Create_InstanceMI"));
@@ -196,7 +196,7 @@ TEST_F(BrokerTest, TakesAnOmittedNamespaceForTheDefaultOne) {
   EXPECT_EQ(instance.path.nameSpace, "root/cimv2");
 }
 
-TEST_F(BrokerTest, AnswersNotFoundWhereTheProviderReturnsNothing) {
+TEST_F(BrokerTest, AnswersNotFoundIfTheProviderReturnsNothing) {
   get("T_Thing.Name=\"z\"");
   EXPECT_EQ(status_.rc, 6);
   EXPECT_THAT(status_.message, HasSubstr("T_Thing.Name=\"z\""));
@@ -239,7 +239,7 @@ TEST_F(BrokerTest, LocalOnlyLeavesOutWhatIsInherited) {
   EXPECT_THAT(propertyNames(found[0]), ElementsAre("Extra"));
 }
 
-TEST_F(BrokerTest, TellsProvidersTheFlagsAndTheCaller) {
+TEST_F(BrokerTest, GivesProvidersTheFlagsAndTheCaller) {
   Selection selection;
   selection.localOnly = true;
   selection.includeQualifiers = true;
@@ -292,7 +292,7 @@ TEST_F(BrokerTest, AnExceptionBecomesAFailureWithItsText) {
   EXPECT_EQ(names("T_Thing").size(), 3U);  // the process goes on
 }
 
-TEST_F(BrokerTest, HandsOnTheStatusOfAProvider) {
+TEST_F(BrokerTest, PassesTheStatusOfAProviderOn) {
   get("T_Trouble.Name=\"fail\"");
   EXPECT_EQ(status_.rc, 2);
   EXPECT_THAT(status_.message, HasSubstr("CIM_ERR_ACCESS_DENIED"));
@@ -465,7 +465,7 @@ TEST_F(BrokerTest, FiltersTheFarEndsByClassItself) {
   EXPECT_EQ(associatorNames("T_Other.Name=\"o\"", filter).size(), 2U);
 }
 
-TEST_F(BrokerTest, DoesNotAskWhereTheFarEndCannotBeOfTheResultClass) {
+TEST_F(BrokerTest, DoesNotAskIfTheFarEndCannotBeOfTheResultClass) {
   AssociationFilter filter;
   filter.resultClass = "T_Unserved";
   EXPECT_THAT(associatorNames("T_Thing.Name=\"a\"", filter), IsEmpty());
@@ -485,7 +485,7 @@ TEST_F(BrokerTest, RefusesClassesInTheFilterThatDoNotExist) {
   EXPECT_EQ(status_.rc, 4);
 }
 
-TEST_F(BrokerTest, ChecksRolesAndHandsThemOnInTheSchemasSpelling) {
+TEST_F(BrokerTest, ChecksRolesAndPassesThemOnInTheSchemasSpelling) {
   AssociationFilter filter;
   filter.role = "left";
   filter.resultRole = "RIGHT";
@@ -497,7 +497,7 @@ TEST_F(BrokerTest, ChecksRolesAndHandsThemOnInTheSchemasSpelling) {
   EXPECT_EQ(status_.rc, 0);
 }
 
-TEST_F(BrokerTest, HandsOnThePropertiesThatTheFarEndMayHave) {
+TEST_F(BrokerTest, PassesOnThePropertiesThatTheFarEndMayHave) {
   Selection selection;
   selection.propertyList = {"extra", "note", "SIZE"};
   AssociationFilter filter;
@@ -623,7 +623,7 @@ TEST_F(BrokerTest, ServesManyThreadsAtOnce) {
   EXPECT_EQ(found, 4 * 25 * 3);
 }
 
-TEST(BrokerLoading, TellsWhyAProviderWasNotMade) {
+TEST(BrokerLoading, ReportsWhyAProviderWasNotMade) {
   BrokerOptions options;
   options.registry = ProviderRegistry();
   options.registry.add({"T_Thing", "Null", "zorvabrokertestprovider", InstanceMi});

@@ -57,7 +57,7 @@ TEST(InteropModel, TheProfileIsOfTheProjectsOwn) {
   EXPECT_EQ(profile.property("OtherRegisteredOrganization")->asText(), "Zorva");
 }
 
-TEST(InteropModel, NamesTheHostWhereNoProviderTellsOfASystem) {
+TEST(InteropModel, NamesTheHostIfNoProviderReturnsASystem) {
   InteropWorld bare = world();
   bare.systems.clear();
   EXPECT_THAT(namesOf(interopInstances(bare, "CIM_ObjectManager")),
@@ -155,7 +155,7 @@ TEST_F(InteropTest, LinksNamespacesToTheManager) {
   EXPECT_EQ(found, 6U);
 }
 
-TEST_F(InteropTest, HandsOutTheCentralInstances) {
+TEST_F(InteropTest, ReturnsTheCentralInstances) {
   broker::MethodResult result;
   EXPECT_TRUE(broker_->invokeMethod(profile(), "GetCentralInstances", {}, result).ok());
   EXPECT_EQ(std::get<std::uint64_t>(result.returnValue.scalar), 0U);

@@ -88,16 +88,16 @@ void noteChange(const Operation& operation, std::string_view what, const broker:
   operation.noteChange(line);
 }
 
-void settleValue(const Operation& operation, broker::Value& value) {
-  const auto settle = [&](broker::Scalar& scalar) {
+void canonicalizeValue(const Operation& operation, broker::Value& value) {
+  const auto canonicalize = [&](broker::Scalar& scalar) {
     if (auto* reference = std::get_if<broker::Boxed<broker::ObjectPath>>(&scalar)) {
       broker::ObjectPath& path = **reference;
       if (operation.host.isThis(path.host, operation.hostHeader)) path.host.clear();
-      for (broker::NamedValue& key : path.keys) settleValue(operation, key.value);
+      for (broker::NamedValue& key : path.keys) canonicalizeValue(operation, key.value);
     }
   };
-  settle(value.scalar);
-  for (broker::Scalar& element : value.elements) settle(element);
+  canonicalize(value.scalar);
+  for (broker::Scalar& element : value.elements) canonicalize(element);
 }
 
 namespace {
@@ -144,7 +144,7 @@ void completeKeys(const Operation& operation, broker::ObjectPath& path) {
 
 }  // namespace
 
-Status settlePath(const Operation& operation, broker::ObjectPath& path) {
+Status canonicalizePath(const Operation& operation, broker::ObjectPath& path) {
   if (!path.host.empty() && !operation.host.isThis(path.host, operation.hostHeader) &&
       !isNameOfASystem(operation, path.host)) {
     return {CMPI_RC_ERR_INVALID_PARAMETER,
@@ -153,7 +153,7 @@ Status settlePath(const Operation& operation, broker::ObjectPath& path) {
   path.host.clear();
   path.nameSpace = operation.nameSpace;
   for (broker::NamedValue& key : path.keys) {
-    settleValue(operation, key.value);
+    canonicalizeValue(operation, key.value);
     if (!key.name.empty()) continue;
     const schema::Class* declared = operation.classes().find(path.className);
     if (declared == nullptr) continue;  // the broker reports it
@@ -206,10 +206,10 @@ void noteCall(const Operation& operation, const broker::ObjectPath& path, const 
 Status invokeMethod(Operation& operation) {
   broker::ObjectPath path = operation.call.target;
   Status status = checkSaidTypes(operation);
-  if (status.ok()) status = settlePath(operation, path);
+  if (status.ok()) status = canonicalizePath(operation, path);
   if (!status.ok()) return status;
   std::vector<broker::NamedValue> input = operation.call.input;
-  for (broker::NamedValue& argument : input) settleValue(operation, argument.value);
+  for (broker::NamedValue& argument : input) canonicalizeValue(operation, argument.value);
   broker::MethodResult result;
   status = operation.broker.invokeMethod(path, operation.call.name, input, result, operation.caller);
   if (!status.ok()) return status;

@@ -52,9 +52,9 @@ broker::Status invokeMethod(Operation& operation);
 /// Brings the path into the form that the broker takes. It gets the call's namespace. A host that is this one is
 /// removed, in references too. A key without a name gets its name. Missing keys are added if only one instance has the
 /// given ones. A path of another host is CIM_ERR_INVALID_PARAMETER.
-broker::Status settlePath(const Operation& operation, broker::ObjectPath& path);
+broker::Status canonicalizePath(const Operation& operation, broker::ObjectPath& path);
 /// The same for the references in a value.
-void settleValue(const Operation& operation, broker::Value& value);
+void canonicalizeValue(const Operation& operation, broker::Value& value);
 
 /// Logs a change that succeeded: the action, the object, and the names of the given properties or parameters.
 void noteChange(const Operation& operation, std::string_view what, const broker::ObjectPath& path,

@@ -35,7 +35,7 @@ Status takeQuestion(Operation& operation, Question& question) {
   question.filter = takeFilter(arguments, question.ofReferences);
   if (!question.namesOnly) question.selection = takeSelection(arguments, false);
   Status status = arguments.status();
-  return status.ok() ? settlePath(operation, question.object) : status;
+  return status.ok() ? canonicalizePath(operation, question.object) : status;
 }
 
 // Of classes.

@@ -21,7 +21,7 @@ Status getInstance(Operation& operation) {
   ObjectPath path = arguments.requiredPath("InstanceName");
   const broker::Selection selection = takeSelection(arguments, true);
   Status status = arguments.status();
-  if (status.ok()) status = settlePath(operation, path);
+  if (status.ok()) status = canonicalizePath(operation, path);
   Instance instance;
   if (status.ok()) status = operation.broker.getInstance(path, selection, instance, operation.caller);
   if (!status.ok()) return status;
@@ -71,8 +71,8 @@ Status enumerateInstanceNames(Operation& operation) {
   return status;
 }
 
-void settleProperties(const Operation& operation, Instance& instance) {
-  for (broker::Property& property : instance.properties) settleValue(operation, property.value);
+void canonicalizeProperties(const Operation& operation, Instance& instance) {
+  for (broker::Property& property : instance.properties) canonicalizeValue(operation, property.value);
 }
 
 Status createInstance(Operation& operation) {
@@ -81,7 +81,7 @@ Status createInstance(Operation& operation) {
   Status status = arguments.status();
   if (!status.ok()) return status;
   instance.path.nameSpace = operation.nameSpace;
-  settleProperties(operation, instance);
+  canonicalizeProperties(operation, instance);
   ObjectPath created;
   status = operation.broker.createInstance(instance, created, operation.caller);
   if (!status.ok()) return status;
@@ -109,9 +109,9 @@ Status modifyInstance(Operation& operation) {
   arguments.boolean("IncludeQualifiers", true);  // qualifiers of instances cannot be changed
   const std::optional<std::vector<std::string>> propertyList = arguments.names("PropertyList");
   Status status = arguments.status();
-  if (status.ok()) status = settlePath(operation, instance.path);
+  if (status.ok()) status = canonicalizePath(operation, instance.path);
   if (!status.ok()) return status;
-  settleProperties(operation, instance);
+  canonicalizeProperties(operation, instance);
   return modifyAndNote(operation, instance, propertyList);
 }
 
@@ -119,7 +119,7 @@ Status deleteInstance(Operation& operation) {
   Arguments arguments(operation.call);
   ObjectPath path = arguments.requiredPath("InstanceName");
   Status status = arguments.status();
-  if (status.ok()) status = settlePath(operation, path);
+  if (status.ok()) status = canonicalizePath(operation, path);
   if (status.ok()) status = operation.broker.deleteInstance(path, operation.caller);
   if (status.ok()) noteChange(operation, "deleted", path);
   return status;
@@ -140,7 +140,7 @@ Status getProperty(Operation& operation) {
   ObjectPath path = arguments.requiredPath("InstanceName");
   const std::string name = arguments.requiredText("PropertyName");
   Status status = arguments.status();
-  if (status.ok()) status = settlePath(operation, path);
+  if (status.ok()) status = canonicalizePath(operation, path);
   const schema::ClassProperty* property = nullptr;
   if (status.ok()) status = findProperty(operation, path, name, property);
   if (!status.ok()) return status;
@@ -164,11 +164,11 @@ Status setProperty(Operation& operation) {
   const std::string name = arguments.requiredText("PropertyName");
   broker::Value value = arguments.value("NewValue");
   Status status = arguments.status();
-  if (status.ok()) status = settlePath(operation, instance.path);
+  if (status.ok()) status = canonicalizePath(operation, instance.path);
   const schema::ClassProperty* property = nullptr;
   if (status.ok()) status = findProperty(operation, instance.path, name, property);
   if (!status.ok()) return status;
-  settleValue(operation, value);
+  canonicalizeValue(operation, value);
   if (value.isNull) value = broker::Value::null(property->type, property->isArray);
   instance.properties.push_back({property->name, std::move(value), property});
   return modifyAndNote(operation, instance, std::vector<std::string>{property->name});

@@ -158,7 +158,7 @@ Status openAssociated(Operation& operation) {
   selection.propertyList = arguments.names("PropertyList");
   Opening opening;
   Status status = takeOpening(operation, arguments, opening);
-  if (status.ok()) status = settlePath(operation, path);
+  if (status.ok()) status = canonicalizePath(operation, path);
   if (!status.ok()) return status;
   Collector collector(operation);
   const broker::InstanceSink sink = collector.instances(selection);
@@ -174,7 +174,7 @@ Status openAssociatedPaths(Operation& operation) {
   const broker::AssociationFilter filter = takeFilter(arguments, ofReferences);
   Opening opening;
   Status status = takeOpening(operation, arguments, opening);
-  if (status.ok()) status = settlePath(operation, path);
+  if (status.ok()) status = canonicalizePath(operation, path);
   if (!status.ok()) return status;
   Collector collector(operation);
   const broker::PathSink sink = collector.paths();

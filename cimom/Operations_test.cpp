@@ -110,7 +110,7 @@ TEST_F(OperationsTest, APropertyListNamesWhatIsGiven) {
   EXPECT_EQ(count(none, "<KEYVALUE"), 3U);
 }
 
-TEST_F(OperationsTest, QualifiersAndClassOriginsAreGivenToWhoAsksForThem) {
+TEST_F(OperationsTest, QualifiersAndClassOriginsAreReturnedOnRequest) {
   const std::string response =
       ask("GetInstance", parameter("InstanceName", thing("a")) + text("LocalOnly", "false") +
                              text("IncludeQualifiers", "true") + text("IncludeClassOrigin", "true"));
@@ -130,7 +130,7 @@ TEST_F(OperationsTest, GetInstanceTakesAKeyWithoutAName) {
       HasSubstr("4 T_Two has 2 keys"));
 }
 
-TEST_F(OperationsTest, GetInstanceTellsWhyThereIsNone) {
+TEST_F(OperationsTest, GetInstanceReportsWhyThereIsNone) {
   EXPECT_THAT(errorOf("GetInstance", parameter("InstanceName", thing("zz"))), HasSubstr("6 there is no instance"));
   EXPECT_THAT(errorOf("GetInstance", parameter("InstanceName", instanceName("T_None", {}))),
               HasSubstr("5 there is no class"));
@@ -150,7 +150,7 @@ TEST_F(OperationsTest, CreateInstanceGivesTheNameOfWhatWasMade) {
   EXPECT_THAT(response, HasSubstr("new-made"));
 }
 
-TEST_F(OperationsTest, ModifyInstanceHandsOnWhatIsToBeChanged) {
+TEST_F(OperationsTest, ModifyInstancePassesTheChangesOn) {
   const std::string modified =
       "<VALUE.NAMEDINSTANCE>" + thing("a") +
       R"(<INSTANCE CLASSNAME="T_Thing"><PROPERTY NAME="Size" TYPE="uint16"><VALUE>9</VALUE></PROPERTY></INSTANCE>)"
@@ -173,7 +173,7 @@ TEST_F(OperationsTest, ModifyInstanceRefusesValuesAndPropertiesThatDoNotFit) {
   EXPECT_THAT(modify(R"(<PROPERTY NAME="Nope" TYPE="uint16"/>)"), HasSubstr("12 T_Thing has no property Nope"));
 }
 
-TEST_F(OperationsTest, ModifyInstanceFailsWhereNothingWasStored) {
+TEST_F(OperationsTest, ModifyInstanceFailsIfNothingWasStored) {
   const std::string modified =
       "<VALUE.NAMEDINSTANCE>" + thing("stubborn") +
       R"(<INSTANCE CLASSNAME="T_Thing"><PROPERTY NAME="Size" TYPE="uint16"><VALUE>9</VALUE></PROPERTY></INSTANCE>)"

@@ -87,7 +87,7 @@ TEST_F(PullTableTest, KeepsWhatIsAskedForInTime) {
   EXPECT_EQ(table_.bytes(), 0U);
 }
 
-TEST_F(PullTableTest, DropsWhatNobodyComesBackFor) {
+TEST_F(PullTableTest, DropsEnumerationsThatAreNotContinued) {
   open({"a"});
   open({"b"});
   EXPECT_EQ(table_.openCount(), 2U);
@@ -128,7 +128,7 @@ TEST_F(PullTableTest, OfAClientThatHasAsManyAsItMayTheOneThatWaitedLongestGivesW
   for (const std::string& context : {other, first, third, fourth}) EXPECT_TRUE(isOpen(context));
 }
 
-TEST_F(PullTableTest, WhereTheTableIsFullTheClientThatHasMostGivesWay) {
+TEST_F(PullTableTest, IfTheTableIsFullTheClientThatHasMostLosesOne) {
   const std::string oldest = openAs("user 2");
   const std::string first = openAs("user 1");
   const std::string second = openAs("user 1");
@@ -143,7 +143,7 @@ TEST_F(PullTableTest, WhereTheTableIsFullTheClientThatHasMostGivesWay) {
   EXPECT_EQ(table_.openCount(), 4U);
 }
 
-TEST_F(PullTableTest, WhereTheMemoryIsFullTheClientThatHoldsMostGivesWay) {
+TEST_F(PullTableTest, IfTheMemoryIsFullTheClientThatHoldsMostLosesOne) {
   const std::string large = openAs("user 1", std::string(236, 'x'));
   const std::string small = openAs("user 2", std::string(36, 'x'));
   const std::string fresh = openAs("user 3", std::string(136, 'x'));
@@ -193,7 +193,7 @@ TEST_F(PullTableTest, TellsContextsOfOtherNamespacesAndFormsApart) {
   EXPECT_EQ(table_.openCount(), 0U);
 }
 
-TEST_F(PullTableTest, NamesContextsSoThatNobodyCanGuessThem) {
+TEST_F(PullTableTest, NamesOfContextsCannotBeGuessed) {
   const std::string one = open({"a"});
   const std::string other = open({"a"});
   EXPECT_EQ(one.size(), 32U);
@@ -258,7 +258,7 @@ TEST(PulledOperations, GiveInstancesPieceByPiece) {
   EXPECT_THAT(service.ask("PullInstancesWithPath", pull(context, 2)), HasSubstr("<ERROR CODE=\"21\""));
 }
 
-TEST(PulledOperations, EndAtOnceWhereAllIsTaken) {
+TEST(PulledOperations, EndAtOnceIfAllIsTaken) {
   testing::TestService service;
   const std::string response =
       service.ask("OpenEnumerateInstancePaths", className("ClassName", "T_Thing") + text("MaxObjectCount", "3"));

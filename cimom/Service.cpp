@@ -65,7 +65,7 @@ class Turn {
   Turn(std::binary_semaphore& turns, const http::HttpRequest& http, const http::ResponseSink& sink)
       : turns_(http.body.size() > kLargeBody ? &turns : nullptr) {
     while (turns_ != nullptr && !turns_->try_acquire_for(kBetweenLooks)) {
-      if (!sink.isWanted()) throw http::ClientGone("nobody waits for the response");
+      if (!sink.isWanted()) throw http::ClientGone("the client no longer waits for the response");
     }
   }
   ~Turn() {

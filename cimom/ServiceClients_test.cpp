@@ -197,7 +197,7 @@ TEST_F(Wbemcli, ChangesOneSettingAndLeavesTheOthers) {
             "DNSSUFFIXES=a.example b.example \n");
 }
 
-TEST_F(Wbemcli, IsToldWhatCannotBeChanged) {
+TEST_F(Wbemcli, GetsAnErrorForAReadOnlyProperty) {
   // It sends the whole instance, including the properties without a value.
   EXPECT_THAT(ask("mi", kSetting, {"Caption=\"x\""}), HasSubstr("(7) CIM_ERR_NOT_SUPPORTED: these properties of "
                                                                 "ZORVA_DNSSettingData cannot be changed: Caption"));
@@ -206,7 +206,7 @@ TEST_F(Wbemcli, IsToldWhatCannotBeChanged) {
   EXPECT_EQ(contentsOf(server_->file()), kFile);
 }
 
-TEST_F(Wbemcli, IsToldWhatWasNotStored) {
+TEST_F(Wbemcli, GetsAnErrorForAValueThatWasNotStored) {
   std::filesystem::remove(server_->file());
   for (const char* operation : {"mi", "sp"}) {
     EXPECT_THAT(ask(operation, kSetting, {"DomainName=\"lab.example.org\""}),
@@ -238,7 +238,7 @@ TEST_F(Wbemcli, FindsOutWhatIsHere) {
   EXPECT_THAT(ask("ain", endpoint), HasSubstr("CIM_RegisteredProfile.InstanceID=\"ZORVA:DNSClient:1.0.0\""));
 }
 
-TEST_F(Wbemcli, IsToldWhatIsWrong) {
+TEST_F(Wbemcli, GetsErrorDescriptions) {
   EXPECT_THAT(ask("ein", "root/none:CIM_System"), HasSubstr("(3) CIM_ERR_INVALID_NAMESPACE: there is no namespace"));
   EXPECT_THAT(ask("ein", "root/cimv2:No_Such"), HasSubstr("(5) CIM_ERR_INVALID_CLASS"));
   EXPECT_THAT(ask("gc", "root/cimv2:No_Such"), HasSubstr("(6) CIM_ERR_NOT_FOUND"));

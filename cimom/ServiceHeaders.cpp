@@ -91,7 +91,7 @@ std::optional<HttpRefusal> take(const http::HttpRequest& request, const CimHeade
   const std::string prefixed = headers.prefix.empty() ? std::string() : headers.prefix + "-" + std::string(name);
   for (const auto& [known, text] : request.headers) {
     if (!sameName(known, name) && (prefixed.empty() || !sameName(known, prefixed))) continue;
-    if (value) return mismatch("the header " + std::string(name) + " stands twice");
+    if (value) return mismatch("the header " + std::string(name) + " is given twice");
     value = decoded(trimmed(text));
     if (!value) return mismatch("the header " + std::string(name) + " is not UTF-8 in percent-encoding");
   }
@@ -144,7 +144,7 @@ std::optional<HttpRefusal> readHeaders(const http::HttpRequest& request, CimHead
   headers.isExtended = sameName(request.method, "M-POST");
   std::optional<std::string> prefix = declaredPrefix(request);
   if (headers.isExtended && !prefix) {
-    return HttpRefusal{510, "", "M-POST wants the header Man: " + std::string(kMapping) + " ; ns=NN"};
+    return HttpRefusal{510, "", "M-POST needs the header Man: " + std::string(kMapping) + " ; ns=NN"};
   }
   headers.prefix = std::move(prefix).value_or("");
   headers.host = textOf(request, "Host");
@@ -176,7 +176,7 @@ std::optional<HttpRefusal> checkHeaders(const CimHeaders& headers, const cimxml:
     if (!headers.method && !headers.object) return std::nullopt;
     return mismatch("the headers CIMMethod and CIMObject go with a single request, but the body is a MULTIREQ");
   }
-  if (headers.isBatch) return mismatch("the header CIMBatch goes with a MULTIREQ, but the body is a SIMPLEREQ");
+  if (headers.isBatch) return mismatch("the header CIMBatch needs a MULTIREQ, but the body is a SIMPLEREQ");
   const cimxml::Call& call = request.calls.front();
   if (!headers.method) return mismatch("the header CIMMethod is missing");
   if (!headers.object) return mismatch("the header CIMObject is missing");

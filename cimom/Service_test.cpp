@@ -55,7 +55,7 @@ TEST(Service, SendsWhatIsLargeWhileItGrows) {
   EXPECT_LT(sink.largestPiece, 2000U);
 }
 
-TEST(Service, TellsAFailureThatComesTooLateThroughTheSink) {
+TEST(Service, ReportsALateFailureThroughTheSink) {
   ServiceOptions options;
   options.unsentText = 100;
   TestService service(options);
@@ -126,8 +126,8 @@ TEST(Service, RefusesHeadersThatDoNotFit) {
       {with("CIMObject", ""), "the header CIMObject is missing"},
       {with("CIMObject", "root/other"), "the header CIMObject is \"root/other\", but the body has the namespace"},
       {with("CIMObject", "root%FFcimv2"), "the header CIMObject is not UTF-8"},
-      {with("cimobject", "root/cimv2"), "the header CIMObject stands twice"},
-      {with("CIMBatch", "1"), "the header CIMBatch goes with a MULTIREQ"},
+      {with("cimobject", "root/cimv2"), "the header CIMObject is given twice"},
+      {with("CIMBatch", "1"), "the header CIMBatch needs a MULTIREQ"},
   };
   for (const auto& [request, problem] : cases) {
     const CollectingSink sink = service.ask(request);
@@ -271,7 +271,7 @@ TEST(Service, LeavesALateAnswerInWhichEachOperationHasFailed) {
   EXPECT_EQ(cimxml::testing::grammarProblem(late.body), "");
 }
 
-TEST(Service, DoesNotReadOnWhereNobodyWaitsAnyMore) {
+TEST(Service, StopsReadingIfTheClientNoLongerWaits) {
   TestService service;
   std::string extra;
   for (int i = 0; i < 50'000; ++i) extra += "<EXTRA/>";

@@ -183,7 +183,7 @@ std::remove_cv_t<Type> argument(int position) {
   }
 }
 
-// The position that stands for a slot's return value.
+// The position of a slot's return value.
 constexpr int kAnswer = 60;
 
 struct Call {
@@ -504,7 +504,7 @@ TEST(CMPI_ABI_SUITE, EveryMacroReachesItsSlotWithItsArgumentsInOrder) {
   {                                                                                   \
     ++checked;                                                                        \
     const auto* check = std::ranges::find(byHand, std::string(#macro), &Check::name); \
-    ASSERT_NE(check, std::end(byHand)) << "nobody checks " #macro;                    \
+    ASSERT_NE(check, std::end(byHand)) << "no check of " #macro;                      \
     run(*check);                                                                      \
   }
 #define WITHDRAWN(name) ++withdrawn;

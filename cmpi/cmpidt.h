@@ -433,7 +433,7 @@ typedef enum _CMPIErrorProbableCause {
   DatasetModem_Error = 12,                     /* A modem or data set failed */
   Degraded_Signal = 13,                        /* A signal grew worse */
   DTE_DCE_Interface_Error = 14,                /* Between terminal and line equipment */
-  Enclosure_Door_Open = 15,                    /* A cabinet's door stands open */
+  Enclosure_Door_Open = 15,                    /* A cabinet's door is open */
   Equipment_Malfunction = 16,                  /* Equipment works wrongly */
   Excessive_Vibration = 17,                    /* It shakes too much */
   File_Format_Error = 18,                      /* A file is not of the form expected */
@@ -548,7 +548,7 @@ typedef enum _CMPIErrorProbableCause {
   Out_of_Hours_Activity = 127,                 /* Something happened at an unusual time */
   Out_of_Service = 128,                        /* Taken out of service */
   Procedural_Error = 129,                      /* Wrongly operated */
-  Unexpected_Information = 130,                /* Data that nobody asked for */
+  Unexpected_Information = 130,                /* Data that was not requested */
 } CMPIErrorProbableCause;
 
 /* The form of an error's source: CIM_Error.ErrorSourceFormat. */

@@ -155,7 +155,7 @@ static inline CMPIBoolean CMIsNullObject(const void* o) {
 /* d microseconds as a point in time, or with i as an interval. */
 #define CMNewDateTimeFromBinary(b, d, i, rc) ((b)->eft->newDateTimeFromBinary((b), (d), (i), (rc)))
 
-/* The date and time that the 25 characters d stand for. */
+/* The date and time that the 25 characters d mean. */
 #define CMNewDateTimeFromChars(b, d, rc) ((b)->eft->newDateTimeFromChars((b), (d), (rc)))
 
 /* The query q in the language l, compiled; the selected properties go to *p. */

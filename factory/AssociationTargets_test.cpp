@@ -144,7 +144,7 @@ TEST_F(AssociationTargets, WithoutAnAssociationClassOrAPathThereIsNoFarEnd) {
   EXPECT_THAT(messages(), ElementsAre(HasSubstr("Target Class is EMPTY")));
 }
 
-TEST_F(AssociationTargets, RightClassIsToldAtEntryAndExitAndDecidesNothing) {
+TEST_F(AssociationTargets, RightClassIsLoggedAtEntryAndExitAndDecidesNothing) {
   EXPECT_EQ("ZORVA_ComputerSystem", targetOf("ZORVA_DNSProtocolEndPoint", "ZORVA_DNSHostedAccessPoint", "CIM_Any"));
   const std::string list =
       " get_assoc_targetClass_Name, _broker=ADDR ref=ADDR _RefLeftClass=ZORVA_DNSHostedAccessPoint"
@@ -154,7 +154,7 @@ TEST_F(AssociationTargets, RightClassIsToldAtEntryAndExitAndDecidesNothing) {
       ElementsAre("3000 ENTERING" + list, "4000 MESSAGE Target Class is ZORVA_ComputerSystem", "3000 EXITING" + list));
   for (const LogLine& line : logger.pairs().ofFunction("get_assoc_targetClass_Name")) {
     EXPECT_EQ("factory/AssociationTargets.cpp", line.file);
-    EXPECT_EQ("factory/AssociationTargets.cpp", line.toldFile());
+    EXPECT_EQ("factory/AssociationTargets.cpp", line.fileInText());
   }
 }
 
@@ -183,7 +183,7 @@ TEST_F(AssociationTargets, FarEndPathHasTheSourcesNamespaceThisHostAndNoKeys) {
               ElementsAre("Zorvagent.DNSObjFactory 3000 ENTERING get_assoc_targetClass_ObjectPath" + list));
 }
 
-TEST_F(AssociationTargets, NoPathIsMadeWhereThereIsNoFarEnd) {
+TEST_F(AssociationTargets, NoPathIsMadeIfThereIsNoFarEnd) {
   EXPECT_EQ(nullptr, pathOf(Path("ZORVA_ComputerSystem"), "ZORVA_DNSSAPSAPDependency"));
   EXPECT_THAT(broker.calls().steps(), IsEmpty());
 }

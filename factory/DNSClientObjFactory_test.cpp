@@ -61,7 +61,7 @@ TEST_F(Factory, ReadsEndpointsAndServersWhenItIsMade) {
   EXPECT_EQ(2, factory.getNumberOfDNSServerInstances());
 }
 
-TEST_F(Factory, ReadsNoServersWhereThereAreNoEndpoints) {
+TEST_F(Factory, ReadsNoServersIfThereAreNoEndpoints) {
   world.host().install();
   const DNSClientObjFactory factory;
   EXPECT_EQ(0, factory.getNumberOfDNSClientInstances());
@@ -70,7 +70,7 @@ TEST_F(Factory, ReadsNoServersWhereThereAreNoEndpoints) {
   EXPECT_FALSE(logger.pairs().entered("getDNSServerInstances"));
 }
 
-TEST_F(Factory, GoesOnWithWhatAFailedReadLeft) {
+TEST_F(Factory, ContinuesWithThePartialResultOfAFailedRead) {
   world.nic("eth0", {.servers = {"192.0.2.1"}}).nic("eth1").install();
   std::vector<int> seen;
   for (std::size_t n = 2;; ++n) {
@@ -127,7 +127,7 @@ TEST_F(Factory, EndpointIsMadeCallByCall) {
                   "I1.setProperty(\"EnabledState\", uint16 2)"));
 }
 
-TEST_F(Factory, EndpointTellsItsWayInTheLog) {
+TEST_F(Factory, EndpointLogsItsSteps) {
   world.host().install();
   make(usualClient());
   const LogLines lines = logger.pairs().ofCategory("Zorvagent.DNSObjFactory");
@@ -140,12 +140,12 @@ TEST_F(Factory, EndpointTellsItsWayInTheLog) {
   for (const LogLine& line : lines) {
     EXPECT_EQ("makeDNSClientInstance", line.function);
     EXPECT_EQ("factory/DNSClientObjFactory.cpp", line.file);
-    EXPECT_EQ("factory/DNSClientObjFactory.cpp", line.toldFile());
-    EXPECT_EQ(line.line, line.toldLine());
+    EXPECT_EQ("factory/DNSClientObjFactory.cpp", line.fileInText());
+    EXPECT_EQ(line.line, line.lineInText());
   }
 }
 
-TEST_F(Factory, EndpointOfTheServiceProcessorStandsOnAFixedName) {
+TEST_F(Factory, EndpointOfTheServiceProcessorHasASystemWithAFixedName) {
   world.host("host1").install();
   DNSClient client = usualClient();
   client.setDNSSCCN("ZORVA_SPComputerSystem");
@@ -232,7 +232,7 @@ TEST_F(Factory, SuffixThatCannotBeMadeLeavesItsElementUnset) {
   }
 }
 
-TEST_F(Factory, StatusOfTheLastElementStands) {
+TEST_F(Factory, StatusOfTheLastElementIsKept) {
   world.host().install();
   broker.failEach("setElementAt", Mode::SetRc);
   EXPECT_EQ(texts({}).type, RecordingBroker::read(make(usualClient()))["DNSSuffixesToAppend"].type);
@@ -288,7 +288,7 @@ TEST_F(Factory, ServerIsMadeCallByCall) {
                   "I1.setProperty(\"InfoFormat\", uint16 3)"));
 }
 
-TEST_F(Factory, ServerTellsItsWayInTheLog) {
+TEST_F(Factory, ServerLogsItsSteps) {
   world.host().install();
   make(usualServer(), nullptr, true);
   EXPECT_THAT(logger.pairs().ofCategory("Zorvagent.DNSObjFactory").briefs(),
@@ -439,7 +439,7 @@ INSTANTIATE_TEST_SUITE_P(Of, Selection,
 
 // --- the functions over all and over one
 
-TEST_F(Factory, FunctionsTellTheirArgumentsOnTheWayInAndOut) {
+TEST_F(Factory, FunctionsLogTheirArgumentsAtEntryAndExit) {
   world.nic("eth0", {.servers = {"192.0.2.1"}}).install();
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> paths;
@@ -515,7 +515,7 @@ TEST_F(Factory, PathThatIsNotMadeKeepsTheEarlierOnes) {
   }
 }
 
-TEST_F(Factory, UnknownNameIsToldAndLeftWithoutAnExitLine) {
+TEST_F(Factory, UnknownNameIsLoggedWithoutAnExitLine) {
   world.nic("eth0", {.servers = {"192.0.2.1"}}).install();
   DNSClientObjFactory factory;
   logger.clear();
@@ -530,7 +530,7 @@ TEST_F(Factory, UnknownNameIsToldAndLeftWithoutAnExitLine) {
   EXPECT_THAT(logger.pairs().ofKind(LineKind::Exiting), IsEmpty());
 }
 
-TEST_F(Factory, InstanceThatIsNotMadeStandsInTheResult) {
+TEST_F(Factory, InstanceThatIsNotMadeIsInTheResult) {
   world.nic("eth0", {.servers = {"192.0.2.1"}}).install();
   DNSClientObjFactory factory;
   std::vector<CMPIInstance*> instances;

@@ -80,7 +80,7 @@ TEST_F(DNSGeneralSettingDataObjectsTest, WhetherToAppendSuffixesIsNeverSet) {
   EXPECT_THAT(made({"AppendPrimarySuffixes", "AppendParentSuffixes"}).names(), ElementsAre("InstanceID"));
 }
 
-TEST_F(DNSGeneralSettingDataObjectsTest, TheFilterIsSetWhereMoreThanThePathIsWanted) {
+TEST_F(DNSGeneralSettingDataObjectsTest, TheFilterIsSetIfMoreThanThePathIsRequested) {
   make();
   EXPECT_THAT(broker_.calls().lines(), Contains("I1.setPropertyFilter(null, {\"InstanceID\"})"));
   broker_.startOver();
@@ -129,7 +129,7 @@ TEST_F(DNSGeneralSettingDataObjectsTest, SuffixesAreCountedInSixteenBits) {
   EXPECT_EQ(texts({"0", "1"}), made()["DNSSuffixesToAppend"]);
 }
 
-TEST_F(DNSGeneralSettingDataObjectsTest, EachSuffixIsTold) {
+TEST_F(DNSGeneralSettingDataObjectsTest, EachSuffixIsLogged) {
   world_->file("eth0", "DNSSUFFIXES=a b \n");
   make({"DNSSuffixesToAppend"});
   const LogLines told = lines().ofKind(LineKind::Variable);
@@ -140,7 +140,7 @@ TEST_F(DNSGeneralSettingDataObjectsTest, EachSuffixIsTold) {
 
 // --- failures of the broker
 
-TEST_F(DNSGeneralSettingDataObjectsTest, APathOrAnInstanceThatCannotBeMadeIsToldByNobody) {
+TEST_F(DNSGeneralSettingDataObjectsTest, APathOrAnInstanceThatCannotBeMadeIsNotLogged) {
   for (const char* name : {"newObjectPath", "newInstance"}) {
     for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
       broker_.startOver();
@@ -252,7 +252,7 @@ TEST_F(DNSGeneralSettingDataObjectsTest, TheKeyIsReadAndComparedWithNothing) {
   }
 }
 
-TEST_F(DNSGeneralSettingDataObjectsTest, AnInstanceThatCannotBeMadeStandsInTheResultAsNull) {
+TEST_F(DNSGeneralSettingDataObjectsTest, AnInstanceThatCannotBeMadeIsInTheResultAsNull) {
   Instances instances;
   broker_.failEach("newObjectPath", Mode::ReturnNull);
   EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIInstances(broker_.cmpi(), ref_, nullptr, &instances, &status_));
@@ -260,7 +260,7 @@ TEST_F(DNSGeneralSettingDataObjectsTest, AnInstanceThatCannotBeMadeStandsInTheRe
   EXPECT_THAT(instances, ElementsAre(nullptr, nullptr));
 }
 
-TEST_F(DNSGeneralSettingDataObjectsTest, APathThatCannotBeMadeIsTold) {
+TEST_F(DNSGeneralSettingDataObjectsTest, APathThatCannotBeMadeIsLogged) {
   for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
     logger_.clear();
     broker_.failNext("newObjectPath", mode);

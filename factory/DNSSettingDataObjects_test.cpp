@@ -98,11 +98,11 @@ TEST_F(DNSSettingDataObjectsTest, NamesOfTheListAreExactText) {
   EXPECT_THAT(broker_.calls().only({"setProperty"}), SizeIs(1));
 }
 
-TEST_F(DNSSettingDataObjectsTest, NamesThatTheClassLacksOrThatStandTwiceAreNoMatter) {
+TEST_F(DNSSettingDataObjectsTest, NamesThatTheClassLacksOrThatAreGivenTwiceAreIgnored) {
   EXPECT_THAT(made({"NoSuchProperty", "Caption", "Caption", ""}).names(), ElementsAre("InstanceID", "Caption"));
 }
 
-TEST_F(DNSSettingDataObjectsTest, TheFilterIsSetWhereMoreThanThePathIsWanted) {
+TEST_F(DNSSettingDataObjectsTest, TheFilterIsSetIfMoreThanThePathIsRequested) {
   make(nullptr, false);
   EXPECT_THAT(broker_.calls().lines(), Contains("I1.setPropertyFilter(null, {\"InstanceID\"})"));
   broker_.startOver();
@@ -139,7 +139,7 @@ TEST_F(DNSSettingDataObjectsTest, EmptyTextsAreSet) {
   EXPECT_EQ(chars(""), instance["ConfigurationName"]);
 }
 
-TEST_F(DNSSettingDataObjectsTest, ABareInterfaceLacksWhatNobodyKnows) {
+TEST_F(DNSSettingDataObjectsTest, ABareInterfaceLacksUnknownValues) {
   newWorld().nic("eth0").install();
   EXPECT_THAT(made().names(), ElementsAre("InstanceID", "Caption", "Description", "ElementName", "AddressOrigin",
                                           "ConfigurationName", "UseSuffixWhenRegistering", "DHCPOptionsToUse"));
@@ -262,7 +262,7 @@ TEST_F(DNSSettingDataObjectsTest, ALastServerWhoseStringFailsLeavesItsCodeInTheS
   EXPECT_EQ(CMPI_RC_ERR_FAILED, status_.rc);
 }
 
-TEST_F(DNSSettingDataObjectsTest, WhatTheInstanceRefusesStaysUnset) {
+TEST_F(DNSSettingDataObjectsTest, APropertyThatTheInstanceRefusesStaysUnset) {
   broker_.failEach("setProperty", Mode::SetRc);
   EXPECT_THAT(made().names(), IsEmpty());
   EXPECT_EQ(kAllProperties.size(), broker_.callsOf("setProperty"));
@@ -295,7 +295,7 @@ TEST_F(DNSSettingDataObjectsTest, WhateverTheBrokerFailsAtNothingBreaks) {
 
 // --- all, one, and paths
 
-TEST_F(DNSSettingDataObjectsTest, AllInstancesHoldsAPlaceForEachNodeAlsoWhereNoneCouldBeMade) {
+TEST_F(DNSSettingDataObjectsTest, AllInstancesHasAnElementForEachNodeEvenIfNoneCouldBeMade) {
   world_->nic("eth1").install();
   broker_.failNext("newObjectPath", Mode::ReturnNull);
   std::vector<CMPIInstance*> instances;

@@ -117,21 +117,21 @@ TEST_F(InstanceModification, OfTheSettingDataSaysWhatWasRefusedByItsNumberAndLea
   EXPECT_THAT(logger_.pairs().errors(), IsEmpty());
 }
 
-TEST_F(InstanceModification, OfTheSettingDataFailsWithoutAWordWhereNoInterfaceHasTheKey) {
+TEST_F(InstanceModification, OfTheSettingDataFailsWithoutALogLineIfNoInterfaceHasTheKey) {
   EXPECT_EQ(1U,
             modify(modifyDNSSettingDataCMPIInstance, Path("ZORVA_DNSSettingData").key("InstanceID", "x"), setting_));
   EXPECT_THAT(logger_.pairs().errors(), IsEmpty());
   EXPECT_TRUE(logger_.pairs().exited("modifyDNSSettingDataCMPIInstance"));
 }
 
-TEST_F(InstanceModification, OfTheGeneralDataFailsWhereNeitherPropertyIsThere) {
+TEST_F(InstanceModification, OfTheGeneralDataFailsIfNeitherPropertyIsThere) {
   EXPECT_EQ(1U, modifyGeneral(general_));
   EXPECT_EQ(1U, modifyGeneral(general_.with("DNSSuffixesToAppend", "no array")));
   EXPECT_EQ(0U, modifyGeneral(general_.with("DNSSuffixesToAppend", texts({"a"}))));
   EXPECT_EQ(0U, modifyGeneral(general_.with("ConfigurationName", "home")));
 }
 
-TEST_F(InstanceModification, OfTheEndpointIsDoneAlsoWhereNoNodeHasTheName) {
+TEST_F(InstanceModification, OfTheEndpointIsDoneEvenIfNoNodeHasTheName) {
   const Path nobody = Path("ZORVA_DNSProtocolEndPoint").key("Name", "eth9");
   EXPECT_EQ(0U, modify(modifyDNSProtocolEndpointCMPIInstance, nobody, Instance("ZORVA_DNSProtocolEndPoint")));
   EXPECT_FALSE(logger_.pairs().exited("modifyDNSProtocolEndpointCMPIInstance"));

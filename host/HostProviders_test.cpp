@@ -85,7 +85,7 @@ TEST_F(HostProviders, FurtherAddressesAreNamedByTheirOrdinal) {
   EXPECT_THAT(names(endpoints_, "ZORVA_IPProtocolEndpoint", "Name"), ElementsAre("eth0", "eth0_2", "eth0_3", "bmc0"));
 }
 
-TEST_F(HostProviders, ANameThatAnInterfaceHasIsGivenToNoAddress) {
+TEST_F(HostProviders, NoAddressGetsANameThatAnInterfaceHas) {
   World world;
   world.host()
       .nic("eth0", {.addresses = {{"192.0.2.1", 24}, {"192.0.2.2", 24}}})
@@ -94,7 +94,7 @@ TEST_F(HostProviders, ANameThatAnInterfaceHasIsGivenToNoAddress) {
   EXPECT_THAT(names(endpoints_, "ZORVA_IPProtocolEndpoint", "Name"), ElementsAre("eth0", "eth0_3", "eth0_2"));
 }
 
-TEST_F(HostProviders, AnEndpointTellsItsAddressByVersion) {
+TEST_F(HostProviders, AnEndpointHasItsAddressByVersion) {
   const std::vector<Instance> all = endpoints_.enumerateInstances(Path("ZORVA_IPProtocolEndpoint")).instances();
   ASSERT_THAT(all, SizeIs(4));
   EXPECT_EQ(all[0]["IPv4Address"].text(), "192.0.2.10");
@@ -113,7 +113,7 @@ TEST_F(HostProviders, AnEndpointTellsItsAddressByVersion) {
   EXPECT_EQ(all[3]["AddressOrigin"].number(), 10U);
 }
 
-TEST_F(HostProviders, AnAssignmentStandsForAnInterfaceAndAVersion) {
+TEST_F(HostProviders, AnAssignmentBelongsToAnInterfaceAndAVersion) {
   EXPECT_THAT(names(assignments_, "ZORVA_IPAssignmentSettingData", "InstanceID"),
               ElementsAre("Computer%eth0%ipv4", "Computer%eth0%ipv6", "BMC%bmc0%ipv6"));
 }

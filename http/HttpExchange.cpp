@@ -60,7 +60,7 @@ void HttpExchange::start(WaitListener& waits) {
 
 void HttpExchange::begin(int status, const HeaderList& headers) {
   const std::lock_guard lock(mutex_);
-  if (gone_ || givenUp_) throw ClientGone("nobody waits for the response");
+  if (gone_ || givenUp_) throw ClientGone("the client no longer waits for the response");
   status_ = status;
   headers_ = headers;
   begun_ = true;
@@ -69,7 +69,7 @@ void HttpExchange::begin(int status, const HeaderList& headers) {
 void HttpExchange::write(std::string_view text) {
   std::unique_lock lock(mutex_);
   while (!text.empty()) {
-    if (gone_ || givenUp_) throw ClientGone("nobody waits for the rest of the response");
+    if (gone_ || givenUp_) throw ClientGone("the client no longer waits for the rest of the response");
     const std::string_view piece = text.substr(0, kWhole);
     text.remove_prefix(piece.size());
     append(piece);

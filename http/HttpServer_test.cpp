@@ -165,7 +165,7 @@ TEST(HttpServer, AnOldClientGetsALongResponseUpToTheEndOfTheConnection) {
   EXPECT_TRUE(response.body == text);
 }
 
-TEST(HttpServer, ResponsesAreCompressedForWhoAcceptsIt) {
+TEST(HttpServer, ResponsesAreCompressedForClientsThatAcceptIt) {
   for (const std::size_t size : {std::size_t{5'000}, std::size_t{2'000'000}}) {
     const std::string text = longText(size);
     Server server([&](const HttpRequest&, ResponseSink& sink) { answer(sink, text); });
@@ -205,7 +205,7 @@ TEST(HttpServer, NoMoreThanAMebibyteIsEverUnsent) {
   EXPECT_EQ(response.body.size(), 400 * piece.size());
 }
 
-TEST(HttpServer, AFailureAfterTheBeginningIsToldInTrailers) {
+TEST(HttpServer, AFailureAfterTheBeginningIsReportedInTrailers) {
   for (const std::size_t size : {std::size_t{10}, std::size_t{500'000}}) {
     Server server([&](const HttpRequest&, ResponseSink& sink) {
       answer(sink, longText(size));
@@ -235,7 +235,7 @@ TEST(HttpServer, AFailureClosesTheConnectionOfAClientThatTakesNoTrailers) {
   EXPECT_TRUE(wire.isClosedWithin(seconds(10)));
 }
 
-TEST(HttpServer, AHandlerThatThrowsCostsItsOwnRequestOnly) {
+TEST(HttpServer, AHandlerThatThrowsFailsOnlyItsOwnRequest) {
   Server server([](const HttpRequest& request, ResponseSink& sink) {
     if (request.body == "bad") throw std::runtime_error("out of order");
     echo(request, sink);
@@ -306,7 +306,7 @@ TEST(HttpServer, HandlersThatHangKeepNoWorkerFromOthers) {
   }
 }
 
-TEST(HttpServer, AHandlerThatDoesNotReturnIsAnsweredAsItHasSaid) {
+TEST(HttpServer, AHandlerThatDoesNotReturnGetsItsLateAnswer) {
   HttpLimits limits;
   limits.provider = milliseconds(200);
   Gate gate;
@@ -345,7 +345,7 @@ TEST(HttpServer, AHandlerCanSeeThatItWasGivenUp) {
   EXPECT_TRUE(hasSeen);
 }
 
-TEST(HttpServer, AHandlerThatHangsAfterTheBeginningIsToldInTrailers) {
+TEST(HttpServer, AHandlerThatHangsAfterTheBeginningIsReportedInTrailers) {
   HttpLimits limits;
   limits.provider = milliseconds(300);
   Gate gate;
@@ -365,7 +365,7 @@ TEST(HttpServer, AHandlerThatHangsAfterTheBeginningIsToldInTrailers) {
   gate.open();
 }
 
-TEST(HttpServer, AClientThatGoesEndsTheWorkForIt) {
+TEST(HttpServer, AClientThatLeavesEndsTheWorkForIt) {
   Gate gone;
   Server server([&](const HttpRequest&, ResponseSink& sink) {
     sink.begin(200, kXml);
@@ -510,7 +510,7 @@ TEST(HttpServer, AThousandSlowAndHalfOpenClientsLeaveAWorkingOneUnharmed) {
   EXPECT_TRUE(slow[0]->isClosedWithin(seconds(10))) << "the oldest of them had to go";
 }
 
-TEST(HttpServer, OptionsTellWhatTheServerCan) {
+TEST(HttpServer, OptionsListTheServersCapabilities) {
   Server server(echo);
   Wire wire(server.port());
   ASSERT_TRUE(wire.send("OPTIONS * HTTP/1.1\r\nHost: x\r\n\r\n"));
@@ -560,7 +560,7 @@ TEST(HttpServer, OtherMethodsAreTurnedDown) {
   EXPECT_EQ(brew.receive().status, 501);
 }
 
-TEST(HttpServer, StopWaitsForWhatIsInWorkAndGivesUpTheRest) {
+TEST(HttpServer, StopWaitsForRequestsInWorkAndAbandonsTheRest) {
   HttpLimits limits;
   limits.drain = milliseconds(300);
   Gate gate;

@@ -77,7 +77,7 @@ std::optional<Refusal> checkFields(const HeaderList& headers) {
     for (std::size_t k = 0; k < i; ++k) {
       if (!equalNames(withoutPrefix(headers[k].first), bare)) continue;
       const bool isCim = equalNames(bare.substr(0, 3), "CIM") || equalNames(bare, "Man");
-      return bad("the header field " + std::string(bare) + " stands there twice", isCim ? kHeaderMismatch : kNotValid);
+      return bad("the header field " + std::string(bare) + " is given twice", isCim ? kHeaderMismatch : kNotValid);
     }
   }
   return std::nullopt;

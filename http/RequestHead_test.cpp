@@ -92,7 +92,7 @@ TEST(RequestHead, ABodyThatIsTooLongIsRefusedBeforeItComes) {
 
 TEST(RequestHead, ABodyNeedsALength) { EXPECT_EQ(statusOf(checkWithout("Content-Length", {})), 411); }
 
-TEST(RequestHead, HeadersOfCimStandThereOnce) {
+TEST(RequestHead, HeadersOfCimAreGivenOnce) {
   for (const char* name : {"CIMOperation", "cimmethod", "CIMObject", "73-CIMObject"}) {
     const auto refusal = check({{name, "x"}});
     EXPECT_EQ(statusOf(refusal), 400) << name;

@@ -24,7 +24,7 @@ TEST(DNSClient, IsEmptyWhenItIsMade) {
   EXPECT_EQ(0, client.getRequestedState());
 }
 
-TEST(DNSClient, FormatAndTypeAreFixedAlsoOnARecordThatNobodyFilled) {
+TEST(DNSClient, FormatAndTypeAreFixedAlsoOnAnEmptyRecord) {
   DNSClient client;
   EXPECT_EQ("NICName", client.getNameFormat());
   EXPECT_EQ("DNS", client.getOtherTypeDescription());
@@ -78,7 +78,7 @@ TEST(DNSClient, ClassOfTheSystemIsAlwaysUsable) {
   EXPECT_TRUE(client.setDNSSCCN(""));
 }
 
-TEST(DNSClient, InterfaceTypeIsOtherWhateverIsGiven) {
+TEST(DNSClient, InterfaceTypeIsAlwaysOther) {
   for (const unsigned int type : {0U, 1U, 4097U, 0xffffffffU}) {
     DNSClient client;
     EXPECT_TRUE(client.setprotocolIFType(type));
@@ -97,7 +97,7 @@ TEST(DNSClient, EnabledStateIsMappedFromTheHostsOwn) {
   }
 }
 
-TEST(DNSClient, RequestedStateIsNotApplicableWhateverIsGiven) {
+TEST(DNSClient, RequestedStateIsAlwaysNotApplicable) {
   for (const unsigned short raw : std::vector<unsigned short>{0, 1, 12, 65535}) {
     DNSClient client;
     EXPECT_TRUE(client.setRequestedState(raw));
@@ -121,7 +121,7 @@ TEST(DNSClient, SuffixSearchOrderLeavesTheSuffixesUntouched) {
   EXPECT_THAT(client.getDNSSuffixesToAppend(), ElementsAre("example.org"));
 }
 
-TEST(DNSClient, CopyGoesItsOwnWay) {
+TEST(DNSClient, CopyIsIndependent) {
   DNSClient client;
   client.setDomainName("example.org");
   DNSClient copy = client;
@@ -144,7 +144,7 @@ TEST(DNSClientSearchOrder, IsAcceptedOnAHostWithoutServers) {
   EXPECT_EQ(0, DNSClient().setDNSServerSearchOrder({"192.0.2.1"}));
 }
 
-TEST(DNSClientSearchOrder, FailsWhereTheServersCannotBeRead) {
+TEST(DNSClientSearchOrder, FailsIfTheServersCannotBeRead) {
   World world;
   world.installUnreadable();
   EXPECT_EQ(1, DNSClient().setDNSServerSearchOrder({"192.0.2.1"}));
@@ -205,7 +205,7 @@ TEST(DNSClientWalk, FillsARecordFromTheNode) {
   EXPECT_EQ("ZORVA_ComputerSystem", client.getDNSSCCN());
 }
 
-TEST(DNSClientWalk, TellsItsWayInTheLog) {
+TEST(DNSClientWalk, LogsItsSteps) {
   EXPECT_THAT(walkOver({.domain = " example.org "}).lines.briefsWithCategory(),
               ElementsAre("Zorvagent.DNSClient 3000 ENTERING getDNSClientInstances, dnsClientMap=ADDR",
                           "Zorvagent.DNSClient 4000 VARIABLE string =  example.org ",
@@ -213,12 +213,12 @@ TEST(DNSClientWalk, TellsItsWayInTheLog) {
                           "Zorvagent.DNSClient 3000 EXITING getDNSClientInstances, dnsClientMap=ADDR"));
 }
 
-TEST(DNSClientWalk, LinesTellOfTheWalkAndItsFile) {
+TEST(DNSClientWalk, LinesNameTheWalkAndItsFile) {
   for (const LogLine& line : walkOver({.hostName = "", .domain = ""}).lines) {
     EXPECT_EQ("getDNSClientInstances", line.function);
     EXPECT_EQ("model/DNSClient.cpp", line.file);
-    EXPECT_EQ("model/DNSClient.cpp", line.toldFile());
-    EXPECT_EQ(line.line, line.toldLine());
+    EXPECT_EQ("model/DNSClient.cpp", line.fileInText());
+    EXPECT_EQ(line.line, line.lineInText());
   }
 }
 
@@ -248,21 +248,21 @@ TEST(DNSClientWalk, SecondNodeWithoutANameReplacesTheFirst) {
   EXPECT_EQ("second.org", walk[""].getDomainName());
 }
 
-TEST(DNSClientWalk, EmptyNameIsToldTwiceAndStoredUnderTheEmptyKey) {
+TEST(DNSClientWalk, EmptyNameIsLoggedTwiceAndStoredUnderTheEmptyKey) {
   const Walk walk = walkOver({}, "");
   EXPECT_EQ(0, walk.answer);
   EXPECT_THAT(walk.names(), ElementsAre(""));
   EXPECT_THAT(walk.warnings(), ElementsAre("Failed while setting Name", "Failed while setting Element Name"));
 }
 
-TEST(DNSClientWalk, EmptyTextsAreToldAndTheRecordIsStored) {
+TEST(DNSClientWalk, EmptyTextsAreLoggedAndTheRecordIsStored) {
   const Walk walk = walkOver({.hostName = "", .domain = ""});
   EXPECT_EQ(0, walk.answer);
   EXPECT_THAT(walk.names(), ElementsAre("eth0"));
   EXPECT_THAT(walk.warnings(), ElementsAre("Failed while setting IP Host Name.", "Failed while setting Domain Name."));
 }
 
-TEST(DNSClientWalk, DomainOfSpacesIsToldAndLeftEmpty) {
+TEST(DNSClientWalk, DomainOfSpacesIsLoggedAndLeftEmpty) {
   const Walk walk = walkOver({.domain = "   "});
   EXPECT_THAT(walk.warnings(), ElementsAre("Failed while setting Domain Name."));
   EXPECT_EQ("", walk["eth0"].getDomainName());
@@ -322,7 +322,7 @@ TEST(DNSClientWalk, AddsToTheMapThatItIsGiven) {
   EXPECT_EQ("", walk["eth0"].getHostName());
 }
 
-TEST(DNSClientWalk, UnreadableTreeIsToldWithoutAnExitLine) {
+TEST(DNSClientWalk, UnreadableTreeIsLoggedWithoutAnExitLine) {
   World world;
   world.installUnreadable();
   const Walk walk;
@@ -332,7 +332,7 @@ TEST(DNSClientWalk, UnreadableTreeIsToldWithoutAnExitLine) {
               ElementsAre("3000 ENTERING getDNSClientInstances, dnsClientMap=ADDR", "6000 MESSAGE Caught Exception"));
 }
 
-TEST(DNSClientWalk, MakingItsFirstCursorStandsUnguarded) {
+TEST(DNSClientWalk, MakingItsFirstCursorIsUnguarded) {
   World world;
   world.nic("eth0").install();
   const FailingTree failing(1);

@@ -24,7 +24,7 @@ TEST(DNSServer, IsTheFirstInOrderWhenItIsMade) {
   EXPECT_EQ(1, server.getOrderOfAccess());
 }
 
-TEST(DNSServer, FormatAndContextAreFixedAlsoOnARecordThatNobodyFilled) {
+TEST(DNSServer, FormatAndContextAreFixedAlsoOnAnEmptyRecord) {
   DNSServer server;
   EXPECT_EQ("DNSServer", server.getNameFormat());
   EXPECT_EQ(3, server.getAccessContext());
@@ -99,7 +99,7 @@ TEST(DNSServerWalk, RecordsAreSortedAndKeepTheirPlaceInTheList) {
   EXPECT_THAT(walk.places(), ElementsAre(Place("10.0.0.1", 3), Place("192.0.2.1", 2), Place("192.0.2.9", 1)));
 }
 
-TEST(DNSServerWalk, TellsItsWayInTheLog) {
+TEST(DNSServerWalk, LogsItsSteps) {
   World world;
   world.nic("eth0", {.servers = {"192.0.2.9", "", "192.0.2.9"}}).install();
   const Walk walk;
@@ -151,7 +151,7 @@ TEST(DNSServerWalk, AddsToTheMapThatItIsGiven) {
   EXPECT_THAT(Walk({{"192.0.2.1", before}}).places(), ElementsAre(Place("192.0.2.1", 5), Place("192.0.2.9", 1)));
 }
 
-TEST(DNSServerWalk, UnreadableTreeIsToldWithoutAnExitLine) {
+TEST(DNSServerWalk, UnreadableTreeIsLoggedWithoutAnExitLine) {
   World world;
   world.installUnreadable();
   const Walk walk;

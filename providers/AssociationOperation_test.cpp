@@ -66,7 +66,7 @@ TEST(PassesResultClass, TakesNoneTheOwnNameAndTheCimNameInAnyCase) {
   }
 }
 
-TEST(AssociationOr, IsTheProvidersOwnOnlyWhereNoneIsGiven) {
+TEST(AssociationOr, IsTheProvidersOwnOnlyIfNoneIsGiven) {
   EXPECT_STREQ("ZORVA_A", associationOr(nullptr, "ZORVA_A"));
   EXPECT_STREQ("", associationOr("", "ZORVA_A"));
   EXPECT_STREQ("ZORVA_B", associationOr("ZORVA_B", "ZORVA_A"));
@@ -74,7 +74,7 @@ TEST(AssociationOr, IsTheProvidersOwnOnlyWhereNoneIsGiven) {
 
 // --- Paths and pairs
 
-TEST(IsMissing, TellsOfPathsThatAreNullOrWithoutHandleInTheOperationsNameAtTheCallersPlace) {
+TEST(IsMissing, LogsPathsThatAreNullOrWithoutHandleInTheOperationsNameAtTheCallersPlace) {
   RecordingLogger logger;
   RecordingBroker broker;
   const std::string category = "Zorvagent.SomeProvider";

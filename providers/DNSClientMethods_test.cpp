@@ -97,7 +97,7 @@ TEST_P(EndpointMethod, LeavesTheHostAsItIs) {
   EXPECT_EQ(std::nullopt, world.fileContent("eth0"));
 }
 
-TEST_P(EndpointMethod, TellsItsWayInTheLog) {
+TEST_P(EndpointMethod, LogsItsSteps) {
   haveOne();
   const Outcome outcome = invoke(kClass.key("Name", "eth0"));
   const LogLines lines = outcome.lines.ofFunction(GetParam().function);
@@ -227,7 +227,7 @@ TEST_P(EndpointMethod, SurvivesEveryFailureOfTheBroker) {
   EXPECT_LE(4U * 7, tried);
 }
 
-TEST_P(EndpointMethod, ArgumentThatFailsIsNotHandedOn) {
+TEST_P(EndpointMethod, ArgumentThatFailsIsNotPassedOn) {
   haveOne();
   for (const Mode mode : {Mode::SetRc, Mode::RcAndNull}) {
     broker.failNext("getArg", mode);
@@ -290,7 +290,7 @@ TEST_F(EndpointMethods, ServerSearchOrderReadsTheServersAgain) {
   EXPECT_EQ(2U, outcome.lines.ofFunction("getDNSServerInstances").ofKind(LineKind::Entering).size());
 }
 
-TEST_F(EndpointMethods, ServerSearchOrderFailsWhereTheServersCannotBeReadAgain) {
+TEST_F(EndpointMethods, ServerSearchOrderFailsIfTheServersCannotBeReadAgain) {
   haveOne();
   // The tree fails in the last walk, that of the method itself.
   std::vector<zorva::agent::TreeCall> calls;

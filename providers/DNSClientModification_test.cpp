@@ -161,7 +161,7 @@ TEST_F(DNSClientModification, AnUnknownNameIsASuccessThatChangesNothing) {
   EXPECT_EQ(asItWas_, node(1));
 }
 
-TEST_F(DNSClientModification, ANodeWithoutANameIsPassedOverAndNotTold) {
+TEST_F(DNSClientModification, ANodeWithoutANameIsSkippedAndNotLogged) {
   World world;
   world.nic("x", {.domain = "nameless", .isUnnamed = true}).nic("eth0").install();
   const Outcome outcome = modify(kWhole, "");
@@ -181,7 +181,7 @@ TEST_F(DNSClientModification, AMissingKeyIsAnsweredWithTheBrokersCode) {
 
 // --- which properties count as present
 
-TEST_F(DNSClientModification, WhatTheInstanceLacksStaysAsItWas) {
+TEST_F(DNSClientModification, PropertiesThatTheInstanceLacksDoNotChange) {
   const Outcome outcome = modify(kEmpty.with("Hostname", "newhost"));
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);
   EXPECT_THAT(node(0), ElementsAre("example.org", "example.org", "newhost"));
@@ -299,7 +299,7 @@ TEST_F(DNSClientModification, AStepBeforeAnExceptionKeepsItsEffect) {
   EXPECT_EQ(2U, domainIsSet);  // setting the host name failed in both ways
 }
 
-TEST_F(DNSClientModification, AValueIsToldBeforeItIsSet) {
+TEST_F(DNSClientModification, AValueIsLoggedBeforeItIsSet) {
   std::vector<std::string> toldLast;
   forEachTreeFailure([&](std::size_t, Thrown) {
     restore();

@@ -21,7 +21,7 @@ class Endpoints : public ::testing::Test {
   InstanceProvider provider{DNSClientProvider_Create_InstanceMI, broker};
 };
 
-TEST_F(Endpoints, NamesAreReadMadeAndHandedOutInThisOrder) {
+TEST_F(Endpoints, NamesAreReadMadeAndReturnedInThisOrder) {
   world.nic("eth0").install();
   EXPECT_THAT(
       provider.enumerateInstanceNames(kClass).story(),
@@ -39,7 +39,7 @@ TEST_F(Endpoints, NamesAreReadMadeAndHandedOutInThisOrder) {
           "returnObjectPath(OP1)", "returnDone()", "log 4000 EXITING DNSClient_EnumInstanceNames", "log 4000 banner"));
 }
 
-TEST_F(Endpoints, InstanceIsReadMadeAndHandedOutInThisOrder) {
+TEST_F(Endpoints, InstanceIsReadMadeAndReturnedInThisOrder) {
   world.nic("eth0").install();
   const std::string one =
       "OneDNSClientCMPIInstance, broker=ADDR objectPath=ADDR key=ADDR properties=ADDR "
@@ -64,7 +64,7 @@ TEST_F(Endpoints, InstanceIsReadMadeAndHandedOutInThisOrder) {
                           "log 4000 EXITING DNSClient_GetInstance", "log 4000 banner"));
 }
 
-TEST_F(Endpoints, OfTheServiceProcessorStandOnAFixedName) {
+TEST_F(Endpoints, OfTheServiceProcessorHaveASystemWithAFixedName) {
   world.host("host1").nic("eth0").bmc().nic("bmc0").install();
   const Outcome outcome = provider.enumerateInstanceNames(kClass);
   ASSERT_EQ(2U, outcome.paths().size());
@@ -84,7 +84,7 @@ TEST_F(Endpoints, ComeInTheOrderOfTheirNamesAndNotOfTheTree) {
   EXPECT_THAT(names, ElementsAre("bmc0", "eth10", "eth2", "wlan0"));
 }
 
-TEST_F(Endpoints, NameIsThatOfTheInterfaceAsItStands) {
+TEST_F(Endpoints, NameIsExactlyThatOfTheInterface) {
   world.nic("  br/0:1 ").install();
   EXPECT_EQ(chars("  br/0:1 "), provider.enumerateInstances(kClass).instances().at(0)["Name"]);
 }

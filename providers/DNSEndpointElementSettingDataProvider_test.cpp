@@ -36,7 +36,7 @@ class EndpointElementSettingData : public SettingAssociationTest {
 
 // --- Enumerations
 
-TEST_F(EndpointElementSettingData, InstancesAreBuiltFirstAndHandedOutThen) {
+TEST_F(EndpointElementSettingData, InstancesAreBuiltFirstAndThenReturned) {
   installOne();
   const Outcome all = enumerateInstances();
   EXPECT_EQ(tell({entry(operation("EnumInstances")),
@@ -177,7 +177,7 @@ TEST_F(EndpointElementSettingData, FailureOfTheBuilderLeavesTheSearchForOneDoneA
   EXPECT_THAT(outcome.instances(), IsEmpty());
 }
 
-TEST_F(EndpointElementSettingData, NameThatTheBrokerCannotTellIsHandedOnAsItIs) {
+TEST_F(EndpointElementSettingData, NameThatTheBrokerCannotReadIsPassedOnUnchanged) {
   installThree();
   const Outcome outcome = failing(
       "getObjectPath", Mode::RcAndNull, [this] { return enumerateInstanceNames(); }, 3);
@@ -200,7 +200,7 @@ TEST_F(EndpointElementSettingData, EndpointIsMadeWithThePropertiesThatWereAskedF
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);
 }
 
-TEST_F(EndpointElementSettingData, EndpointsPathIsToldItsPlaceOnceMore) {
+TEST_F(EndpointElementSettingData, EndpointsPathGetsNamespaceAndHostAgain) {
   installOne();
   const Outcome outcome = associatorNames(settingPath("Computer%eth0"));
   EXPECT_EQ(tell({entry(operation("AssociatorNames")),
@@ -267,7 +267,7 @@ TEST_F(EndpointElementSettingData, SettingOfNoEndpointLeadsNowhere) {
   }
 }
 
-TEST_F(EndpointElementSettingData, MalformedSourceIsToldAndLeftOpen) {
+TEST_F(EndpointElementSettingData, MalformedSourceIsLoggedAndLeavesTheResultOpen) {
   installThree();
   for (const char* instanceID : {"", "%", "%%%", "Computereth0", "%eth0", "eth0%", "%%eth0%%", "dnsgen1:host1"}) {
     SCOPED_TRACE(instanceID);
@@ -321,7 +321,7 @@ TEST_F(EndpointElementSettingData, SettingIsMadeFromTheSourceWithThePropertiesTh
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);
 }
 
-TEST_F(EndpointElementSettingData, SettingsPathGoesOutAsItCame) {
+TEST_F(EndpointElementSettingData, SettingsPathIsReturnedUnchanged) {
   installOne();
   const Outcome outcome = associatorNames(endpointPath("eth0"));
   EXPECT_EQ(tell({entry(operation("AssociatorNames")),
@@ -367,7 +367,7 @@ TEST_F(EndpointElementSettingData, NameOfAReferenceOfAnEndpointCostsAnInstanceFo
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);
 }
 
-TEST_F(EndpointElementSettingData, CandidatesAreToldByAssociatorsAlone) {
+TEST_F(EndpointElementSettingData, OnlyAssociatorsLogTheCandidates) {
   installThree();
   EXPECT_THAT(associators(endpointPath("eth0")).lines.ofCategory(under.category).ofKind(LineKind::Variable), SizeIs(3));
   EXPECT_THAT(associators(settingPath("Computer%eth0")).lines.ofCategory(under.category).ofKind(LineKind::Variable),
@@ -379,7 +379,7 @@ TEST_F(EndpointElementSettingData, CandidatesAreToldByAssociatorsAlone) {
   }
 }
 
-TEST_F(EndpointElementSettingData, EveryMatchGoesOutAndNoneEndsTheWalk) {
+TEST_F(EndpointElementSettingData, EveryMatchIsReturnedAndNoneEndsTheWalk) {
   world.host().nic("eth0").nic("eth1").bmc().nic("eth0").install();
   const auto both = ElementsAre("Computer%eth0", "BMC%eth0");
   EXPECT_THAT(textsOf(associators(endpointPath("eth0")).instances(), "InstanceID"), both);
@@ -388,7 +388,7 @@ TEST_F(EndpointElementSettingData, EveryMatchGoesOutAndNoneEndsTheWalk) {
   EXPECT_THAT(pairsOf(referenceNames(endpointPath("eth0"))), ElementsAre("eth0 > Computer%eth0", "eth0 > BMC%eth0"));
 }
 
-TEST_F(EndpointElementSettingData, MalformedCandidateStopsTheOperationAndWhatWentOutStays) {
+TEST_F(EndpointElementSettingData, MalformedCandidateStopsTheOperationAndEarlierResultsStay) {
   installMalformed();
   for (const Operation& run : allFrom(endpointPath("eth0"))) {
     const Outcome outcome = run();
@@ -414,7 +414,7 @@ TEST_F(EndpointElementSettingData, HostWithoutSettingsAnswersAnEndpointWithAnEmp
   }
 }
 
-TEST_F(EndpointElementSettingData, FailedFetchOfSettingPathsIsToldAndLeftOpen) {
+TEST_F(EndpointElementSettingData, FailedFetchOfSettingPathsIsLoggedAndLeavesTheResultOpen) {
   installThree();
   for (const Operation& run : pathsFrom(endpointPath("eth0"))) {
     const Outcome outcome = failing(newPath(kSettingClass), Mode::RcAndNull, run, 3);

@@ -64,7 +64,7 @@ TEST_F(GenEndpointElementSettingData, NamesAreMadeOfBothPathsAndGoOutAtOnce) {
   EXPECT_EQ(CMPI_RC_OK, names.rc);
 }
 
-TEST_F(GenEndpointElementSettingData, InstancesAreBuiltFirstAndHandedOutThen) {
+TEST_F(GenEndpointElementSettingData, InstancesAreBuiltFirstAndThenReturned) {
   installOne();
   const Outcome all = enumerateInstances();
   EXPECT_EQ(tell({entry(operation("EnumInstances")),
@@ -195,7 +195,7 @@ TEST_F(GenEndpointElementSettingData, SettingIsMadeFromTheSourceWithThePropertie
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);
 }
 
-TEST_F(GenEndpointElementSettingData, SettingsPathGoesOutAsItCame) {
+TEST_F(GenEndpointElementSettingData, SettingsPathIsReturnedUnchanged) {
   installOne();
   const Outcome outcome = associatorNames(endpointPath("eth0"));
   EXPECT_EQ(tell({entry(operation("AssociatorNames")),
@@ -253,7 +253,7 @@ TEST_F(GenEndpointElementSettingData, EndpointsAreMadeWithThePropertiesThatWereA
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);
 }
 
-TEST_F(GenEndpointElementSettingData, EndpointsPathsAreToldTheirPlaceOnceMore) {
+TEST_F(GenEndpointElementSettingData, EndpointsPathsGetNamespaceAndHostAgain) {
   installOne();
   const Outcome outcome = associatorNames(generalSettingPath());
   EXPECT_EQ(tell({entry(operation("AssociatorNames")),
@@ -365,7 +365,7 @@ TEST_F(GenEndpointElementSettingData, EndpointPathThatCannotBeMadeShowsTheBroker
   }
 }
 
-TEST_F(GenEndpointElementSettingData, FailedFetchOfSettingPathsIsToldAndLeftOpen) {
+TEST_F(GenEndpointElementSettingData, FailedFetchOfSettingPathsIsLoggedAndLeavesTheResultOpen) {
   installOne();
   const Path source = endpointPath("eth0");
   for (const Operation& run : pathsFrom(source)) {
@@ -375,7 +375,7 @@ TEST_F(GenEndpointElementSettingData, FailedFetchOfSettingPathsIsToldAndLeftOpen
   }
 }
 
-TEST_F(GenEndpointElementSettingData, EndpointThatCannotBeMadeIsHandedOnAsItIs) {
+TEST_F(GenEndpointElementSettingData, EndpointThatCannotBeMadeIsPassedOnUnchanged) {
   installThree();
   const Outcome outcome = failing(
       "newInstance(", Mode::ReturnNull, [this] { return associators(generalSettingPath()); }, 2);

@@ -49,7 +49,7 @@ class GeneralOrderedComponent : public SettingAssociationTest {
 
 // --- Enumerations
 
-TEST_F(GeneralOrderedComponent, InstancesAreBuiltFirstAndHandedOutThen) {
+TEST_F(GeneralOrderedComponent, InstancesAreBuiltFirstAndThenReturned) {
   installOne();
   const Outcome all = enumerateInstances();
   EXPECT_EQ(
@@ -152,7 +152,7 @@ TEST_F(GeneralOrderedComponent, SettingIsMadeFromTheSourceWithThePropertiesThatW
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);
 }
 
-TEST_F(GeneralOrderedComponent, SettingsPathGoesOutAsItCame) {
+TEST_F(GeneralOrderedComponent, SettingsPathIsReturnedUnchanged) {
   installOne();
   const Outcome outcome = associatorNames(kAssignment);
   EXPECT_EQ(tell({entry(operation("AssociatorNames")),
@@ -246,7 +246,7 @@ TEST_F(GeneralOrderedComponent, NameOfAReferenceOfTheSettingHoldsTheSame) {
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);
 }
 
-TEST_F(GeneralOrderedComponent, ReferencesStandTheReverseOfTheBuildersAndAreAllAlike) {
+TEST_F(GeneralOrderedComponent, ReferencesAreTheReverseOfTheBuildersAndAreAllAlike) {
   installThree();
   const std::string reversed = std::string("dnsgen1:host1 > ") + kIpAssignmentClass;
   EXPECT_THAT(pairsOf(references(generalSettingPath())), ElementsAre(reversed, reversed, reversed));

@@ -70,7 +70,7 @@ class GeneralElementSettingData : public AssociationTest {
 
 // --- Which systems have the settings
 
-TEST_F(GeneralElementSettingData, SystemsWhoseNameStandsInTheInstanceIDArePairedByTheEnumerations) {
+TEST_F(GeneralElementSettingData, SystemsWhoseNameIsInTheInstanceIDArePairedByTheEnumerations) {
   install({});
   for (const char* name : {"host1", "host", "1", "dnsgen1", ":", "dnsgen1:host1", ""}) {
     SCOPED_TRACE(name);
@@ -88,7 +88,7 @@ TEST_F(GeneralElementSettingData, SystemsWhoseNameStandsInTheInstanceIDArePaired
   }
 }
 
-TEST_F(GeneralElementSettingData, MismatchIsToldByTheNamesAndNotByTheInstances) {
+TEST_F(GeneralElementSettingData, MismatchIsLoggedByTheNamesAndNotByTheInstances) {
   install({"host2", "host1"});
   EXPECT_THAT(endOf(enumerateInstanceNames()), ElementsAre("CMPI_RC_OK", "done, marked", kNotMatched));
   EXPECT_THAT(endOf(enumerateInstances()), ElementsAre("CMPI_RC_OK", "done, marked"));
@@ -213,7 +213,7 @@ TEST_F(GeneralElementSettingData, InstancesEndEmptyOnEveryFailureAndShowNoCode) 
   expectEmpty(failing(newPath(kAssociation), Mode::NullHandle, instances(), 2), kNoPathInBuilder);
 }
 
-TEST_F(GeneralElementSettingData, InstanceThatCouldNotBeMadeIsToldAsAMismatchAndLeftOut) {
+TEST_F(GeneralElementSettingData, InstanceThatCouldNotBeMadeIsLoggedAsAMismatchAndLeftOut) {
   install({"host1", "host1"});
   for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
     const Outcome all = failing("newInstance(", mode, instances());
@@ -313,7 +313,7 @@ TEST_F(GeneralElementSettingData, AssociatorsLeaveOpenOnEveryFailureAndShowItsCo
               ElementsAre("CMPI_RC_OK", "not done, not marked", kNoSettingsForAssociations));
 }
 
-TEST_F(GeneralElementSettingData, SettingsThatCouldNotBeMadeAreHandedOutAsTheyAre) {
+TEST_F(GeneralElementSettingData, SettingsThatCouldNotBeMadeAreReturnedUnchanged) {
   install({});
   const Outcome found = failing(
       newPath(kSetting), Mode::ReturnNull, [&] { return associators(systemPath("a")); }, 2);
@@ -376,7 +376,7 @@ TEST_F(GeneralElementSettingData, ReferenceNamesAreThePathsOfInstancesOnTheSourc
             storyOf(referenceNames(generalSettingPath())));
 }
 
-TEST_F(GeneralElementSettingData, ReferencesLeaveOpenWhereTheSettingsCannotBeRead) {
+TEST_F(GeneralElementSettingData, ReferencesLeaveOpenIfTheSettingsCannotBeRead) {
   install({});
   for (const Outcome& found :
        {failing(
@@ -387,7 +387,7 @@ TEST_F(GeneralElementSettingData, ReferencesLeaveOpenWhereTheSettingsCannotBeRea
   }
 }
 
-TEST_F(GeneralElementSettingData, ReferenceThatCouldNotBeMadeIsHandedOutAsItIs) {
+TEST_F(GeneralElementSettingData, ReferenceThatCouldNotBeMadeIsReturnedUnchanged) {
   install({"host1"});
   for (const Path& source : {generalSettingPath(), systemPath("host1")}) {
     const auto references = [&] { return this->references(source); };
@@ -421,7 +421,7 @@ TEST_F(GeneralElementSettingData, SystemsProviderIsNotNeededFromASystem) {
   EXPECT_THAT(referenceNames(systemPath("host1")).paths(), SizeIs(1));
 }
 
-TEST_F(GeneralElementSettingData, SourceOfAClassAtNeitherEndHasNoFarEndAndTheNamesTellItInTheSameWords) {
+TEST_F(GeneralElementSettingData, SourceOfAClassAtNeitherEndHasNoFarEndAndTheNamesLogItWithTheSameText) {
   install({"host1"});
   for (const Path& source : {endpointPath("eth0"), settingPath("Computer%eth0"), Path("CIM_ComputerSystem")}) {
     expectNoFarEnd(source, {"Object Path is NULL in Associators.", "Object Path is NULL in Associators.",

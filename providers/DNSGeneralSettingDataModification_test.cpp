@@ -134,7 +134,7 @@ TEST_F(DNSGeneralSettingDataModification, WithNeitherPropertyTheFailureStaysInTh
   expectLeftOpen(outcome);
 }
 
-TEST_F(DNSGeneralSettingDataModification, AFailureIsASuccessToTheClientWhereTheBrokerSaysNoCode) {
+TEST_F(DNSGeneralSettingDataModification, AFailureIsASuccessToTheClientIfTheBrokerSaysNoCode) {
   broker_.missingProperty = {CMPI_RC_OK, CMPI_nullValue};
   const Outcome outcome = modify(kEmpty);
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);

@@ -38,7 +38,7 @@ class DNSGeneralSettingDataProviderTest : public ::testing::Test {
 
 // --- whole operations
 
-TEST_F(DNSGeneralSettingDataProviderTest, TheEnumeratedInstanceIsMadeAndHandedOut) {
+TEST_F(DNSGeneralSettingDataProviderTest, TheEnumeratedInstanceIsMadeAndReturned) {
   world_.nic("eth0", usualNic()).install().file("eth0", "CONFIG_NAME=c\nDNSSUFFIXES=a b \n");
   const Outcome outcome = provider_.enumerateInstances(kClass);
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);
@@ -67,7 +67,7 @@ TEST_F(DNSGeneralSettingDataProviderTest, TheEnumeratedInstanceIsMadeAndHandedOu
           "log 4000 banner"));
 }
 
-TEST_F(DNSGeneralSettingDataProviderTest, TheEnumeratedNameIsMadeAndHandedOut) {
+TEST_F(DNSGeneralSettingDataProviderTest, TheEnumeratedNameIsMadeAndReturned) {
   world_.nic("eth0", usualNic()).nic("eth1").install();
   const Outcome outcome = provider_.enumerateInstanceNames(kClass.in("root/other"));
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);
@@ -83,7 +83,7 @@ TEST_F(DNSGeneralSettingDataProviderTest, TheEnumeratedNameIsMadeAndHandedOut) {
                   "returnDone()", "log 4000 EXITING DNSGeneralSettingData_EnumInstanceNames", "log 4000 banner"));
 }
 
-TEST_F(DNSGeneralSettingDataProviderTest, TheOneInstanceIsMadeAndHandedOut) {
+TEST_F(DNSGeneralSettingDataProviderTest, TheOneInstanceIsMadeAndReturned) {
   world_.nic("eth0", usualNic()).install();
   const Outcome outcome = provider_.getInstance(id("dnsgen1:myhost"), {"AddressOrigin"});
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);
@@ -108,7 +108,7 @@ TEST_F(DNSGeneralSettingDataProviderTest, LinesSayWhichSourceAndFunctionTheyAreF
   world_.nic("eth0", usualNic()).install();
   const LogLines lines = provider_.enumerateInstances(kClass).lines;
   EXPECT_EQ("Zorvagent.DNSGeneralSettingDataProvider", lines.at(1).category);
-  EXPECT_EQ("providers/DNSGeneralSettingDataProvider.cpp", lines.at(1).toldFile());
+  EXPECT_EQ("providers/DNSGeneralSettingDataProvider.cpp", lines.at(1).fileInText());
   EXPECT_EQ("Zorvagent.DNSObjFactory", lines.at(2).category);
   EXPECT_EQ("getAllDNSGeneralSettingDataCMPIInstances", lines.at(2).function);
   EXPECT_EQ("factory/DNSGeneralSettingDataObjects.cpp", lines.at(2).file);
@@ -190,7 +190,7 @@ TEST_F(DNSGeneralSettingDataProviderTest, APathThatCannotBeMadeLeavesTheNamesOpe
   }
 }
 
-TEST_F(DNSGeneralSettingDataProviderTest, AnInstanceThatCannotBeMadeIsHandedOutAsTheBrokerGaveIt) {
+TEST_F(DNSGeneralSettingDataProviderTest, AnInstanceThatCannotBeMadeIsReturnedAsTheBrokerMadeIt) {
   world_.nic("eth0").install();
   broker_.failEach("newInstance", Mode::ReturnNull);
   for (const Outcome& outcome : {provider_.enumerateInstances(kClass), provider_.getInstance(id("x"))}) {

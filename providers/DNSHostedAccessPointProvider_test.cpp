@@ -245,7 +245,7 @@ TEST_F(HostedAccessPoint, InstancesEndEmptyOnEveryFailureAndShowNoCode) {
   expectEmpty(failing(newPath(kAssociation), Mode::NullHandle, instances(), 2), kNoPath);
 }
 
-TEST_F(HostedAccessPoint, InstanceThatCouldNotBeMadeIsHandedOutAsItIs) {
+TEST_F(HostedAccessPoint, InstanceThatCouldNotBeMadeIsReturnedUnchanged) {
   install({"eth0", "eth1"}, {"host1"});
   for (const auto& [mode, handedOut] :
        {std::pair(Mode::ReturnNull, "returnInstance(null)"), std::pair(Mode::RcAndNull, "returnInstance(null)"),
@@ -420,7 +420,7 @@ TEST_F(HostedAccessPoint, EndpointsThatCouldNotBeFetchedLeaveTheirCode) {
               ElementsAre("CMPI_RC_ERR_FAILED", "not done, not marked", kNoReferences));
 }
 
-TEST_F(HostedAccessPoint, ReferenceThatCouldNotBeMadeIsHandedOutAsItIs) {
+TEST_F(HostedAccessPoint, ReferenceThatCouldNotBeMadeIsReturnedUnchanged) {
   install({"eth0"}, {"host1"});
   for (const Path& source : {endpointPath("eth0"), systemPath("host1")}) {
     EXPECT_THAT(

@@ -51,7 +51,7 @@ class OrderedComponent : public SettingAssociationTest {
 
 // --- Enumerations
 
-TEST_F(OrderedComponent, InstancesAreBuiltFirstAndHandedOutThen) {
+TEST_F(OrderedComponent, InstancesAreBuiltFirstAndThenReturned) {
   installOne();
   const Outcome all = enumerateInstances();
   EXPECT_EQ(
@@ -187,7 +187,7 @@ TEST_F(OrderedComponent, SourceIsTestedOnlyOnceThereIsACandidate) {
   }
 }
 
-TEST_F(OrderedComponent, MalformedAssignmentStopsTheOperationAndWhatWentOutStays) {
+TEST_F(OrderedComponent, MalformedAssignmentStopsTheOperationAndEarlierResultsStay) {
   world.host().nic("eth0").install();
   serveAssignments({"Computer%eth0%ipv4", "malformed", "Computer%eth0%ipv6"});
   for (const Operation& run : allFrom(kSetting)) {
@@ -222,7 +222,7 @@ TEST_F(OrderedComponent, SettingIsMadeFromTheSourceWithThePropertiesThatWereAske
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);
 }
 
-TEST_F(OrderedComponent, SettingsPathGoesOutAsItCame) {
+TEST_F(OrderedComponent, SettingsPathIsReturnedUnchanged) {
   installOne();
   const Outcome outcome = associatorNames(kAssignment);
   EXPECT_EQ(tell({entry(operation("AssociatorNames")),
@@ -279,7 +279,7 @@ TEST_F(OrderedComponent, InstanceIsMadeBeforeTheSourceIsTested) {
 
 // --- From a setting to its assignments
 
-TEST_F(OrderedComponent, AssignmentsAreAskedForWithoutAPropertyListAndTheirPathsTellTheirKeys) {
+TEST_F(OrderedComponent, AssignmentsAreAskedForWithoutAPropertyListAndTheirPathsGiveTheirKeys) {
   world.host().nic("eth0").install();
   serveAssignments({"Computer%eth1%ipv4", "Computer%eth0%ipv4"});
   const Outcome outcome = associators(kSetting, {.properties = {"InstanceID"}});

@@ -173,7 +173,7 @@ TEST_F(RemoteAccessAvailableToElement, InstancesEndEmptyOnEveryFailureAndShowNoC
   expectEmpty(losingHandles(kEndpoint, kAssociation, instances()), kBadEndpoint);
 }
 
-TEST_F(RemoteAccessAvailableToElement, InstanceThatCouldNotBeMadeIsHandedOutAsItIs) {
+TEST_F(RemoteAccessAvailableToElement, InstanceThatCouldNotBeMadeIsReturnedUnchanged) {
   installTwoOfEach();
   for (const auto& [mode, handedOut] :
        {std::pair(Mode::ReturnNull, "returnInstance(null)"), std::pair(Mode::RcAndNull, "returnInstance(null)"),
@@ -238,7 +238,7 @@ TEST_F(RemoteAccessAvailableToElement, PathWithoutKeysIsRefusedWithAWordAndNoCod
             storyOf(got));
 }
 
-TEST_F(RemoteAccessAvailableToElement, InstanceIsDoneAndMarkedWhereTheBuilderFails) {
+TEST_F(RemoteAccessAvailableToElement, InstanceIsDoneAndMarkedIfTheBuilderFails) {
   installOneOfEach();
   const Outcome got =
       failing(newPath(kAssociation), Mode::RcAndNull, [this] { return getInstance(pair("192.0.2.1", "eth0")); });
@@ -469,7 +469,7 @@ TEST_F(RemoteAccessAvailableToElement, SourceOfAClassAtNeitherEndHasNoFarEnd) {
   }
 }
 
-TEST_F(RemoteAccessAvailableToElement, FarEndPathThatCouldNotBeMadeIsToldAndShowsItsCode) {
+TEST_F(RemoteAccessAvailableToElement, FarEndPathThatCouldNotBeMadeIsLoggedAndShowsItsCode) {
   installOneOfEach();
   const auto failingTo = [this](Mode mode, const std::function<Outcome()>& run) {
     return endOf(failing(newPath(kServer), mode, run));

@@ -21,7 +21,7 @@ class Servers : public ::testing::Test {
   InstanceProvider provider{DNSRemoteServiceAccessPointProvider_Create_InstanceMI, broker};
 };
 
-TEST_F(Servers, NamesAreReadMadeAndHandedOutInThisOrder) {
+TEST_F(Servers, NamesAreReadMadeAndReturnedInThisOrder) {
   world.nic("eth0", {.servers = {"192.0.2.53"}}).install();
   EXPECT_THAT(
       provider.enumerateInstanceNames(kClass).story(),
@@ -59,7 +59,7 @@ TEST_F(Servers, OfAHostWithEndpointsAloneAreNone) {
   EXPECT_THAT(outcome.errors(), ElementsAre("***No instance found***", "getAllDNSServerCMPIInstances Failed"));
 }
 
-TEST_F(Servers, OfTheServiceProcessorStandOnTheHostToo) {
+TEST_F(Servers, OfTheServiceProcessorBelongToTheHostToo) {
   world.host("host1").bmc().nic("bmc0", {.servers = {"198.51.100.1"}}).install();
   const Outcome outcome = provider.enumerateInstances(kClass);
   ASSERT_EQ(1U, outcome.instances().size());

@@ -278,7 +278,7 @@ TEST_F(SAPSAPDependency, PathThatNamesNoPairGivesAnEmptyCompletedResult) {
 
 // --- Associators and their names
 
-TEST_F(SAPSAPDependency, AssociatorOfADnsEndpointGoesOutAsTheBrokerGaveItWhateverTheList) {
+TEST_F(SAPSAPDependency, AssociatorOfADnsEndpointIsReturnedAsTheBrokerMadeItWhateverTheList) {
   install({"eth0"}, {"eth0"});
   const Outcome found = associators(endpointPath("eth0"), {.properties = {"Name"}});
   EXPECT_EQ(tell({entry(operation("Associators")),
@@ -419,7 +419,7 @@ TEST_F(SAPSAPDependency, DnsEndpointsThatCouldNotBeFetchedLeaveTheirCode) {
   }
 }
 
-TEST_F(SAPSAPDependency, ReferenceThatCouldNotBeMadeIsHandedOutAsItIs) {
+TEST_F(SAPSAPDependency, ReferenceThatCouldNotBeMadeIsReturnedUnchanged) {
   install({"eth0"}, {"eth0"});
   for (const Path& source : {endpointPath("eth0"), ipEndpointPath("eth0")}) {
     EXPECT_THAT(

@@ -148,7 +148,7 @@ TEST_F(DNSSettingDataModification, ServersAloneAreStoredAndTheConfigurationNameI
   expectDoneWithoutExit(outcome);
 }
 
-TEST_F(DNSSettingDataModification, AMissingPropertyIsASuccessWhereTheBrokerSaysNoCode) {
+TEST_F(DNSSettingDataModification, AMissingPropertyIsASuccessIfTheBrokerSaysNoCode) {
   broker_.missingProperty = {CMPI_RC_OK, CMPI_nullValue};
   EXPECT_EQ(CMPI_RC_OK, modify(empty().with("DNSServerAddresses", texts({"192.0.2.1"}))).rc);
   EXPECT_THAT(valuesInFile(), ElementsAre("oldhost", "old.example.org", "192.0.2.1 ", ""));

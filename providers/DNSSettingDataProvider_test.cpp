@@ -69,7 +69,7 @@ class DNSSettingDataProviderTest : public ::testing::Test {
 
 // --- whole operations
 
-TEST_F(DNSSettingDataProviderTest, EnumeratedInstancesAreMadeFirstAndHandedOutThen) {
+TEST_F(DNSSettingDataProviderTest, EnumeratedInstancesAreMadeFirstAndThenReturned) {
   world_.nic("eth0", usualNic()).bmc().nic("bmc0", {.isUnnamed = true}).install();
   world_.file("eth0", "DOMAINNAME=d\nHOSTNAME=h\nCONFIG_NAME=c\nDNSSERVERS=a b \n");
   const Outcome outcome = provider_.enumerateInstances(kClass);
@@ -116,7 +116,7 @@ TEST_F(DNSSettingDataProviderTest, EnumeratedInstancesAreMadeFirstAndHandedOutTh
           "returnDone()", "log 4000 EXITING DNSSettingData_EnumInstances", "log 4000 banner"));
 }
 
-TEST_F(DNSSettingDataProviderTest, EnumeratedNamesAreMadeFirstAndHandedOutThen) {
+TEST_F(DNSSettingDataProviderTest, EnumeratedNamesAreMadeFirstAndThenReturned) {
   world_.nic("eth0", usualNic()).nic("x", {.isUnnamed = true}).bmc().nic("bmc0").install();
   const Outcome outcome = provider_.enumerateInstanceNames(kClass.in("root/other"));
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);
@@ -134,7 +134,7 @@ TEST_F(DNSSettingDataProviderTest, EnumeratedNamesAreMadeFirstAndHandedOutThen) 
                           "log 4000 EXITING DNSSettingData_EnumInstanceNames", "log 4000 banner"));
 }
 
-TEST_F(DNSSettingDataProviderTest, OneInstanceIsMadeAndHandedOut) {
+TEST_F(DNSSettingDataProviderTest, OneInstanceIsMadeAndReturned) {
   world_.nic("eth0").nic("eth1", usualNic()).install();
   const Outcome outcome = provider_.getInstance(id("Computer%eth1"), {"DomainName"});
   EXPECT_EQ(CMPI_RC_OK, outcome.rc);
@@ -163,12 +163,12 @@ TEST_F(DNSSettingDataProviderTest, LinesSayWhichSourceAndFunctionTheyAreFrom) {
   EXPECT_EQ("Zorvagent.DNSSettingDataProvider", entry.category);
   EXPECT_EQ("markProviderEntry", entry.function);
   EXPECT_EQ("trace/Trace.h", entry.file);
-  EXPECT_EQ("providers/DNSSettingDataProvider.cpp", entry.toldFile());
+  EXPECT_EQ("providers/DNSSettingDataProvider.cpp", entry.fileInText());
   const LogLine& below = lines.at(2);
   EXPECT_EQ("Zorvagent.DNSObjFactory", below.category);
   EXPECT_EQ("getAllDNSSettingDataCMPIInstances", below.function);
   EXPECT_EQ("factory/DNSSettingDataObjects.cpp", below.file);
-  EXPECT_EQ("factory/DNSSettingDataObjects.cpp", below.toldFile());
+  EXPECT_EQ("factory/DNSSettingDataObjects.cpp", below.fileInText());
   const LogLine& cursor = lines.at(3);
   EXPECT_EQ("Zorvagent.DNSSettingDataProvider", cursor.category);
   EXPECT_EQ("settings/DNSSettingData.cpp", cursor.file);
@@ -244,7 +244,7 @@ TEST_F(DNSSettingDataProviderTest, InterfacesOfTheServiceProcessorCountInTreeOrd
               ElementsAre(chars("BMC%bmc0"), chars("Computer%eth1"), chars("Computer%eth0")));
 }
 
-TEST_F(DNSSettingDataProviderTest, AFileWithoutServersLeavesThemOutAlsoWhereTheNodeHasThem) {
+TEST_F(DNSSettingDataProviderTest, AFileWithoutServersLeavesThemOutEvenIfTheNodeHasThem) {
   world_.nic("eth0", usualNic()).install().file("eth0", "DNSSERVERS=\n");
   EXPECT_FALSE(provider_.enumerateInstances(kClass).instances().at(0).has("DNSServerAddresses"));
 }
@@ -291,7 +291,7 @@ TEST_F(DNSSettingDataProviderTest, AMissingKeyIsAnsweredWithTheBrokersCode) {
   EXPECT_FALSE(outcome.markedExit());
 }
 
-TEST_F(DNSSettingDataProviderTest, AnInstanceThatCannotBeMadeIsHandedOutAsTheBrokerGaveIt) {
+TEST_F(DNSSettingDataProviderTest, AnInstanceThatCannotBeMadeIsReturnedAsTheBrokerMadeIt) {
   world_.nic("eth0").nic("eth1").install();
   broker_.failNext("newObjectPath", Mode::ReturnNull);
   const Outcome one = provider_.getInstance(id("Computer%eth0"));

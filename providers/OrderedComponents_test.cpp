@@ -89,7 +89,7 @@ TEST_P(ComponentOfAssignments, MissingProviderIsShownByTheOperationsThatNeedItAn
   }
 }
 
-TEST_P(ComponentOfAssignments, FailedEnumerationDeliversNothingEvenWhereItGaveSome) {
+TEST_P(ComponentOfAssignments, FailedEnumerationDeliversNothingEvenIfItReturnedSome) {
   for (const CMPIrc rc : {CMPI_RC_ERR_FAILED, CMPI_RC_ERR_NOT_FOUND, CMPI_RC_ERR_ACCESS_DENIED}) {
     broker.serve(kIpAssignmentClass, {objectOf(kAssignment)}).rc = rc;
     for (const Operation& run : allFrom(component.setting)) {
@@ -134,7 +134,7 @@ TEST_P(ComponentOfAssignments, EnumerationThatEndsHalfWayLeavesWhatWentOutAndIts
   }
 }
 
-TEST_P(ComponentOfAssignments, PathToAskWithThatCannotBeMadeIsToldAndLeftOpen) {
+TEST_P(ComponentOfAssignments, PathToAskWithThatCannotBeMadeIsLoggedAndLeavesTheResultOpen) {
   const Path& source = component.setting;
   for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
     const char* code = mode == Mode::RcAndNull ? "CMPI_RC_ERR_FAILED" : "CMPI_RC_OK";
@@ -180,7 +180,7 @@ TEST_P(ComponentOfAssignments, BuilderWithoutSettingPathsMarksItsExitAsAnOperati
 
 // --- The settings as the far end
 
-TEST_P(ComponentOfAssignments, FailedFetchOfSettingPathsIsToldAndLeftOpen) {
+TEST_P(ComponentOfAssignments, FailedFetchOfSettingPathsIsLoggedAndLeavesTheResultOpen) {
   for (const Operation& run : pathsFrom(kAssignment)) {
     const Outcome outcome = failing(newPath(settingClass), Mode::RcAndNull, run, 2);  // the far end is the first
     EXPECT_THAT(endOf(outcome), ElementsAre("CMPI_RC_OK", "not done, not marked", component.noSettingPaths));

@@ -120,7 +120,7 @@ TEST_P(EveryProvider, LeavesTheStatusOfItsCreationUntouched) {
   EXPECT_EQ(before, status.msg);
 }
 
-TEST_P(EveryProvider, HandsOutOneTableForEver) {
+TEST_P(EveryProvider, AlwaysReturnsTheSameTable) {
   CMPIInstanceMI* const mi = GetParam().create(broker.cmpi(), nullptr, nullptr);
   EXPECT_EQ(nullptr, mi->hdl);
   EXPECT_EQ(200, mi->ft->ftVersion);
@@ -194,7 +194,7 @@ TEST_P(EveryProvider, LatestCreationsBrokerServesAllItsTables) {
   EXPECT_LT(0U, later.callsOf("newObjectPath"));
 }
 
-TEST_P(EveryAssociationProvider, HandsOutItsTable) {
+TEST_P(EveryAssociationProvider, ReturnsItsTable) {
   CMPIStatus status{CMPI_RC_ERR_FAILED, nullptr};
   CMPIAssociationMI* const mi = GetParam().createAssociation(broker.cmpi(), nullptr, &status);
   EXPECT_EQ(CMPI_RC_ERR_FAILED, status.rc);
@@ -258,7 +258,7 @@ TEST(ProviderFrame, TwelveProvidersHaveEightAssociations) {
   EXPECT_EQ(8U, associationProviders().size());
 }
 
-TEST(MethodProviderOfTheEndpoint, HandsOutItsTable) {
+TEST(MethodProviderOfTheEndpoint, ReturnsItsTable) {
   RecordingBroker broker;
   CMPIMethodMI* const mi = DNSClientProvider_Create_MethodMI(broker.cmpi(), nullptr, nullptr);
   EXPECT_EQ(nullptr, mi->hdl);

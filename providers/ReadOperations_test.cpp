@@ -73,8 +73,8 @@ class Reading : public ::testing::TestWithParam<Reader> {
                                        [](const LogLine& line) { return line.level == 6000; });
     EXPECT_EQ(operation(name), own.function);
     EXPECT_EQ("providers/" + std::string(GetParam().source) + ".cpp", own.file);
-    EXPECT_EQ(own.file, own.toldFile());
-    EXPECT_EQ(own.line, own.toldLine());
+    EXPECT_EQ(own.file, own.fileInText());
+    EXPECT_EQ(own.line, own.lineInText());
     EXPECT_EQ("Zorvagent." + std::string(GetParam().source), own.category);
     const LogLines factory = outcome.lines.ofCategory("Zorvagent.DNSObjFactory");
     EXPECT_THAT(factory.errors(), ElementsAre(inFactory));
@@ -185,7 +185,7 @@ TEST_P(Reading, PathThatIsNotMadeEndsTheNamesWithItsStatus) {
   }
 }
 
-TEST_P(Reading, PathsMadeBeforeTheFailureAreNotHandedOut) {
+TEST_P(Reading, PathsMadeBeforeTheFailureAreNotReturned) {
   haveBoth();
   const Calls calls = provider.enumerateInstanceNames(classPath()).calls;
   std::size_t secondPath = calls.size();
@@ -205,7 +205,7 @@ TEST_P(Reading, GoodPathWithAnRcIsUsed) {
   expectComplete(outcome, "EnumInstanceNames", CMPI_RC_ERR_FAILED);
 }
 
-TEST_P(Reading, InstanceThatIsNotMadeIsHandedOverAsItIs) {
+TEST_P(Reading, InstanceThatIsNotMadeIsReturnedUnchanged) {
   haveBoth();
   const std::pair<Mode, const char*> rows[] = {{Mode::ReturnNull, "returnInstance(null)"},
                                                {Mode::RcAndNull, "returnInstance(null)"},
@@ -226,7 +226,7 @@ TEST_P(Reading, InstanceThatIsNotMadeIsHandedOverAsItIs) {
   }
 }
 
-TEST_P(Reading, InstanceWithoutAPathIsHandedOverAsNull) {
+TEST_P(Reading, InstanceWithoutAPathIsReturnedAsNull) {
   haveBoth();
   for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
     broker.failNext("newObjectPath", mode);
@@ -248,7 +248,7 @@ TEST_P(Reading, PathWithoutKeysGetsNothingAndTheHostIsNotRead) {
   EXPECT_THAT(outcome.calls.lines(), ElementsAre("ref.getKeyCount()", "returnDone()"));
 }
 
-TEST_P(Reading, StatusOfCountingTheKeysStands) {
+TEST_P(Reading, StatusOfCountingTheKeysIsKept) {
   haveBoth();
   broker.failNext("getKeyCount", Mode::RcAndNull);
   const Outcome outcome = provider.getInstance(fullPath(GetParam().first));
@@ -266,7 +266,7 @@ TEST_P(Reading, NameAloneGetsTheInstance) {
   EXPECT_THAT(outcome.errors(), IsEmpty());
 }
 
-TEST_P(Reading, OtherKeysAreNotLookedAtBesideAName) {
+TEST_P(Reading, OtherKeysAreIgnoredIfThereIsAName) {
   haveBoth();
   const Path wrong = fullPath(GetParam().first)
                          .key("SystemName", "elsewhere")
@@ -334,7 +334,7 @@ TEST_P(Reading, ScanComparesAllKeysAndStopsAtTheMatch) {
   EXPECT_THAT(wrong.instances(), IsEmpty());
 }
 
-TEST_P(Reading, ScanHandsThePropertyListOn) {
+TEST_P(Reading, ScanPassesThePropertyListOn) {
   haveBoth();
   broker.failNext("getKey", Mode::NullHandle);
   const Outcome outcome = provider.getInstance(fullPath(GetParam().second), {"ElementName"});

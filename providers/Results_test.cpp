@@ -79,7 +79,7 @@ TEST_F(ResultsOfAnOperation, PathsOfInstancesGoOutInOrderAndLeaveTheLastCode) {
   EXPECT_EQ(CMPI_RC_ERR_FAILED, status.rc);
 }
 
-TEST_F(ResultsOfAnOperation, FirstEqualInstanceGoesOutAlone) {
+TEST_F(ResultsOfAnOperation, OnlyTheFirstEqualInstanceIsReturned) {
   CMPIInstance* twin = association(end("a"), end("c"), "twin");
   returnFirstEqual(result, requested(end("a"), end("c")), {one, two, twin}, true, &status);
   EXPECT_THAT(returned(), ElementsAre("returnInstance(two)"));
@@ -92,7 +92,7 @@ TEST_F(ResultsOfAnOperation, NoneEqualGivesNothing) {
   EXPECT_THAT(returned(), IsEmpty());
 }
 
-TEST_F(ResultsOfAnOperation, InstancesThatAreNullOrWithoutHandleOrPathArePassedOver) {
+TEST_F(ResultsOfAnOperation, InstancesThatAreNullOrWithoutHandleOrPathAreSkipped) {
   CMPIInstance* lost = association(end("a"), end("c"), "lost");
   lost->hdl = nullptr;
   returnFirstEqual(result, requested(end("a"), end("c")), {nullptr, lost, two}, true, &status);
@@ -103,7 +103,7 @@ TEST_F(ResultsOfAnOperation, InstancesThatAreNullOrWithoutHandleOrPathArePassedO
   EXPECT_THAT(returned(), IsEmpty());
 }
 
-TEST_F(ResultsOfAnOperation, ReferencesAreComparedAsPathsOnlyWhereTheKeysAreSaidToBeSome) {
+TEST_F(ResultsOfAnOperation, ReferencesAreComparedAsPathsOnlyIfTheKeysAreReferences) {
   const Path withoutNameSpace = end("b").in("");  // means the namespace of the enclosing path
   returnFirstEqual(result, requested(end("a"), withoutNameSpace), {one}, false, &status);
   EXPECT_THAT(returned(), IsEmpty());

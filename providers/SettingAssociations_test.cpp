@@ -127,7 +127,7 @@ INSTANTIATE_TEST_SUITE_P(All, SettingAssociation, ::testing::ValuesIn(allAssocia
 
 // --- The frame
 
-TEST_P(SettingAssociation, TablesTellTheirNamesAndAreMadeWithoutAStatus) {
+TEST_P(SettingAssociation, TablesHaveTheirNamesAndAreMadeWithoutAStatus) {
   const std::string prefix = association.prefix;
   EXPECT_EQ("instance" + prefix, instanceProvider.mi()->ft->miName);
   EXPECT_EQ("association" + prefix, associationProvider.mi()->ft->miName);
@@ -152,7 +152,7 @@ TEST_P(SettingAssociation, CleanupsAreAnsweredWithSuccess) {
 
 // --- Which far end
 
-TEST_P(SettingAssociation, SourceOfNeitherEndIsToldAndLeftOpen) {
+TEST_P(SettingAssociation, SourceOfNeitherEndIsLoggedAndLeavesTheResultOpen) {
   const std::string name = association.provider.className;
   for (const auto& [operationName, outcome] : fourFrom(serverPath("192.0.2.1"))) {
     SCOPED_TRACE(operationName);
@@ -393,7 +393,7 @@ TEST_P(SettingAssociation, StatusOfABuiltPairIsNotLookedAt) {
 
 // The reference itself is not checked: if a broker makes none, it gets null as argument, and its code is the
 // operation's.
-TEST_P(SettingAssociation, ReferenceThatCannotBeMadeIsHandedOnAsItIs) {
+TEST_P(SettingAssociation, ReferenceThatCannotBeMadeIsPassedOnUnchanged) {
   for (const Direction& direction : directions()) {
     const auto run = [this, &direction] { return references(direction.source.path); };
     const std::size_t last = run().calls.count("newInstance");
@@ -420,7 +420,7 @@ TEST_P(SettingAssociation, AssociationPathOfReferencesIsNotTested) {
   }
 }
 
-TEST_P(SettingAssociation, FarEndThatCannotBeMadeIsToldAndShowsTheBrokersCode) {
+TEST_P(SettingAssociation, FarEndThatCannotBeMadeIsLoggedAndShowsTheBrokersCode) {
   for (const Direction& direction : directions()) {
     const Path& source = direction.source.path;
     for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {

@@ -174,7 +174,7 @@ std::vector<Hostile> hostileRequests() {
   };
 }
 
-TEST(HostileRequests, EachGetsItsAnswerAndALineAndTheServerGoesOn) {
+TEST(HostileRequests, EachGetsItsResponseAndALineAndTheServerContinues) {
   const TestDaemon daemon("[limits]\nheader_kib = 32\n");
   for (const Hostile& hostile : hostileRequests()) {
     SCOPED_TRACE(hostile.name);
@@ -273,7 +273,7 @@ int answersBeside(int port, const std::vector<std::string>& large) {
   return answers;
 }
 
-TEST(HostileRequests, LargeOnesHoldUpNobodyElse) {
+TEST(HostileRequests, LargeOnesDoNotBlockOtherClients) {
   const TestDaemon daemon;
   const std::vector<std::string> large = largeRequests();
   int answers = 0;
@@ -322,7 +322,7 @@ TEST(DaemonProcess, CheckingAConfigurationOpensTheLogAndTheProviders) {
   EXPECT_THAT(lacking.err, HasSubstr("there is no provider library " + (directory / "empty/libzorvahost")));
 }
 
-TEST(DaemonProcess, CheckingAConfigurationLeavesNoLogBehind) {
+TEST(DaemonProcess, CheckingAConfigurationLeavesNoLog) {
   const zorva::agent::testing::TemporaryDirectory directory;
   const std::string good = directory.write("good.toml", "[log]\ntarget = \"log\"\n");
   EXPECT_EQ(TestDaemon::run({"--config", good, "--check-config"}).exitCode, 0);
@@ -336,7 +336,7 @@ TEST(DaemonProcess, SaysWhatIsWrongWithAPortThatIsTaken) {
   EXPECT_THAT(outcome.err, HasSubstr("cannot listen on 127.0.0.1 port " + std::to_string(daemon.port())));
 }
 
-TEST(DaemonProcess, ListensOnBothAddressesWhereNoneIsGiven) {
+TEST(DaemonProcess, ListensOnBothAddressesIfNoneIsGiven) {
   const TestDaemon daemon({}, {"--port", "0"});
   EXPECT_THAT(endpoints(daemon.port()), HasSubstr("eth0"));
 }
@@ -404,7 +404,7 @@ class NotifySocket {
   http::Descriptor socket_;
 };
 
-TEST(DaemonProcess, TellsTheServiceManagerHowItFares) {
+TEST(DaemonProcess, ReportsItsStateToTheServiceManager) {
   const NotifySocket manager;
   TestDaemon daemon({}, {"--listen", "127.0.0.1", "--port", "0"},
                     [&] { ::setenv("NOTIFY_SOCKET", manager.path().c_str(), 1); });
@@ -430,7 +430,7 @@ void handOver(const char* address) {
   ::setenv("LISTEN_FDS", "1", 1);
 }
 
-TEST(DaemonProcess, TakesASocketThatIsHandedOver) {
+TEST(DaemonProcess, TakesAnInheritedSocket) {
   const TestDaemon daemon({}, {"--log-level", "4500"}, [] { handOver("127.0.0.1"); });
   EXPECT_NE(daemon.port(), 5988);
   EXPECT_THAT(endpoints(daemon.port()), HasSubstr("eth0"));

@@ -55,13 +55,13 @@ const std::string kNoName =
 
 // --- finding the node
 
-TEST_F(DNSGeneralSettingDataTest, StandsOnNothingWhereThereIsNoInterface) {
+TEST_F(DNSGeneralSettingDataTest, IsOnNoNodeIfThereIsNoInterface) {
   world_.host().install();
   DNSGeneralSettingData data;
   EXPECT_FALSE(static_cast<bool>(data));
 }
 
-TEST_F(DNSGeneralSettingDataTest, StandsOnNothingWhereAllInterfacesAreTheServiceProcessors) {
+TEST_F(DNSGeneralSettingDataTest, IsOnNoNodeIfAllInterfacesAreTheServiceProcessors) {
   world_.bmc().nic("bmc0").nic("bmc1").install();
   DNSGeneralSettingData data;
   EXPECT_FALSE(static_cast<bool>(data));
@@ -104,7 +104,7 @@ TEST_F(DNSGeneralSettingDataTest, GoesOnToTheNextNodeOnItsOwn) {
   EXPECT_FALSE(static_cast<bool>(data));
 }
 
-TEST_F(DNSGeneralSettingDataTest, ACopyStandsOnTheSameNode) {
+TEST_F(DNSGeneralSettingDataTest, ACopyIsOnTheSameNode) {
   world_.nic("eth0").nic("eth1");
   DNSGeneralSettingData data = found();
   DNSGeneralSettingData copy = data;
@@ -113,7 +113,7 @@ TEST_F(DNSGeneralSettingDataTest, ACopyStandsOnTheSameNode) {
   EXPECT_EQ("eth1", get(data, &DNSGeneralSettingData::getInstanceID).second);
 }
 
-TEST_F(DNSGeneralSettingDataTest, TellsTheSystemOfEachNodeThatItLooksAt) {
+TEST_F(DNSGeneralSettingDataTest, LogsTheSystemOfEachNodeThatItTests) {
   world_.bmc().nic("bmc0").host().nic("eth0").install();
   const RecordingLogger logger;
   DNSGeneralSettingData data;
@@ -126,7 +126,7 @@ TEST_F(DNSGeneralSettingDataTest, TellsTheSystemOfEachNodeThatItLooksAt) {
   EXPECT_EQ("settings/DNSGeneralSettingData.cpp", lines.at(0).file);
 }
 
-TEST_F(DNSGeneralSettingDataTest, ATreeThatCannotBeReadIsToldAndLeavesNoNode) {
+TEST_F(DNSGeneralSettingDataTest, ATreeThatCannotBeReadIsLoggedAndLeavesNoNode) {
   world_.installUnreadable();
   const RecordingLogger logger;
   DNSGeneralSettingData data;
@@ -162,7 +162,7 @@ TEST_F(DNSGeneralSettingDataTest, ItsInstanceIDIsTheNameOfTheInterface) {
   EXPECT_EQ(std::pair(true, "eth0"s), get(atUsualNic(), &DNSGeneralSettingData::getInstanceID));
 }
 
-TEST_F(DNSGeneralSettingDataTest, ANodeWithoutANameHasNoInstanceIDAndThatIsTold) {
+TEST_F(DNSGeneralSettingDataTest, ANodeWithoutANameHasNoInstanceIDAndThatIsLogged) {
   world_.nic("x", {.isUnnamed = true});
   DNSGeneralSettingData data = found();
   const RecordingLogger logger;
@@ -183,7 +183,7 @@ TEST_F(DNSGeneralSettingDataTest, ElementNameCaptionDescriptionAndOriginAreConst
   EXPECT_EQ(2, origin);
 }
 
-TEST_F(DNSGeneralSettingDataTest, WhetherToAppendSuffixesIsNeverGivenAndLeavesTheOutputAsItWas) {
+TEST_F(DNSGeneralSettingDataTest, WhetherToAppendSuffixesIsNeverReturnedAndLeavesTheOutputUnchanged) {
   DNSGeneralSettingData data = atUsualNic();
   for (const bool before : {false, true}) {
     bool value = before;
@@ -195,7 +195,7 @@ TEST_F(DNSGeneralSettingDataTest, WhetherToAppendSuffixesIsNeverGivenAndLeavesTh
 
 // --- file or node
 
-TEST_F(DNSGeneralSettingDataTest, TheConfigurationNameIsThatOfTheFileAndTold) {
+TEST_F(DNSGeneralSettingDataTest, TheConfigurationNameIsThatOfTheFileAndLogged) {
   world_.file("eth0", kBothKeys);
   DNSGeneralSettingData data = atUsualNic();
   const RecordingLogger logger;
@@ -226,7 +226,7 @@ TEST_F(DNSGeneralSettingDataTest, WithoutAFileTheSuffixesAreThoseOfTheNode) {
   EXPECT_THAT(suffixes(atUsualNic()), ElementsAre("example.org"));
 }
 
-TEST_F(DNSGeneralSettingDataTest, SuffixesAreGivenAlsoWhereNobodyHasThem) {
+TEST_F(DNSGeneralSettingDataTest, SuffixesAreReturnedEvenIfThereAreNone) {
   world_.nic("eth0");
   std::vector<std::string> values = {"before"};
   EXPECT_TRUE(found().getDNSSuffixesToAppend(values));
@@ -248,7 +248,7 @@ TEST_F(DNSGeneralSettingDataTest, ANodeWithoutANameHasAFileWhoseNameEndsInTheHyp
 
 // --- setters
 
-TEST_F(DNSGeneralSettingDataTest, SetConfigurationNameTellsTheFileAndReplacesTheKey) {
+TEST_F(DNSGeneralSettingDataTest, SetConfigurationNameLogsTheFileAndReplacesTheKey) {
   world_.file("eth0", "CONFIG_NAME=office\nX=1\n");
   DNSGeneralSettingData data = atUsualNic();
   const RecordingLogger logger;
@@ -259,7 +259,7 @@ TEST_F(DNSGeneralSettingDataTest, SetConfigurationNameTellsTheFileAndReplacesThe
   EXPECT_EQ("setConfigurationName", lines.at(0).function);
 }
 
-TEST_F(DNSGeneralSettingDataTest, SetConfigurationNameTellsTheFileBeforeItWrites) {
+TEST_F(DNSGeneralSettingDataTest, SetConfigurationNameLogsTheFileBeforeItWrites) {
   world_.file("eth0", "CONFIG_NAME=office\n");
   DNSGeneralSettingData data = atUsualNic();
   const FileAtEachLine file(world_, "eth0");
@@ -290,7 +290,7 @@ TEST_F(DNSGeneralSettingDataTest, SetDNSSuffixesToAppendStoresInTheNodeBetweenIt
                           "Zorvagent.DNSSettingDataProvider 3000 EXITING setDNSSuffixesToAppend, dnsSuffixes=ADDR"));
 }
 
-TEST_F(DNSGeneralSettingDataTest, SetDNSSuffixesToAppendTellsThatNothingWasStored) {
+TEST_F(DNSGeneralSettingDataTest, SetDNSSuffixesToAppendReportsThatNothingWasStored) {
   world_.host().install();
   EXPECT_FALSE(DNSGeneralSettingData().setDNSSuffixesToAppend({"new.example.org"}));
 }

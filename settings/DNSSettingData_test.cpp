@@ -52,7 +52,7 @@ std::string logged(const std::string& name, const std::string& value) {
 
 // --- walking
 
-TEST_F(DNSSettingDataTest, StandsOnNothingWhereThereIsNoInterface) {
+TEST_F(DNSSettingDataTest, IsOnNoNodeIfThereIsNoInterface) {
   world_.host().install();
   DNSSettingData data;
   EXPECT_FALSE(static_cast<bool>(data));
@@ -71,7 +71,7 @@ TEST_F(DNSSettingDataTest, WalksOverAllInterfacesThoseOfTheServiceProcessorToo) 
   EXPECT_THAT(found, ElementsAre("Computer%eth0", "Computer%eth1", "BMC%bmc0"));
 }
 
-TEST_F(DNSSettingDataTest, AskingWhetherItStandsFindsTheFileAndTellsIt) {
+TEST_F(DNSSettingDataTest, TestingTheCursorFindsTheFileAndLogsIt) {
   world_.nic("eth0").nic("eth1").install();
   const RecordingLogger logger;
   for (DNSSettingData data; data; ++data) {
@@ -110,7 +110,7 @@ TEST_F(DNSSettingDataTest, AnEmptyNameHasAFileOfItsOwn) {
   EXPECT_EQ(world_.dataDir() + "ifcfg-", at(0).getFileName());
 }
 
-TEST_F(DNSSettingDataTest, ACopyStandsOnTheSameNodeAndMovesOnItsOwn) {
+TEST_F(DNSSettingDataTest, ACopyIsOnTheSameNodeAndMovesOnItsOwn) {
   world_.nic("eth0").nic("eth1").install();
   DNSSettingData data;
   EXPECT_TRUE(static_cast<bool>(data));
@@ -203,13 +203,13 @@ TEST_F(DNSSettingDataTest, TheAddressOriginHasNoLinkToTheBootProtocol) {
   EXPECT_EQ(2, origin);
 }
 
-TEST_F(DNSSettingDataTest, DHCPOptionsAreAppendedBehindWhatIsThere) {
+TEST_F(DNSSettingDataTest, DHCPOptionsAreAppended) {
   std::vector<unsigned short> options = {1, 2};
   EXPECT_TRUE(atUsualNic().getDHCPOptionsToUse(options));
   EXPECT_THAT(options, ElementsAre(1, 2, 8, 14, 17));
 }
 
-TEST_F(DNSSettingDataTest, UseOfTheSuffixIsGivenAndLeavesTheOutputAsItWas) {
+TEST_F(DNSSettingDataTest, UseOfTheSuffixIsReturnedAndLeavesTheOutputUnchanged) {
   DNSSettingData data = atUsualNic();
   for (const bool before : {false, true}) {
     bool value = before;
@@ -218,7 +218,7 @@ TEST_F(DNSSettingDataTest, UseOfTheSuffixIsGivenAndLeavesTheOutputAsItWas) {
   }
 }
 
-TEST_F(DNSSettingDataTest, RegistrationOfTheAddressIsNeverGivenAndLeavesTheOutputAsItWas) {
+TEST_F(DNSSettingDataTest, RegistrationOfTheAddressIsNeverReturnedAndLeavesTheOutputUnchanged) {
   DNSSettingData data = atUsualNic();
   for (const bool before : {false, true}) {
     bool value = before;
@@ -261,31 +261,31 @@ const Scalar kScalars[] = {
 
 class ScalarSource : public DNSSettingDataTest, public ::testing::WithParamInterface<Scalar> {};
 
-TEST_P(ScalarSource, IsTheFileWhereThereIsOne) {
+TEST_P(ScalarSource, IsTheFileIfThereIsOne) {
   world_.file("eth0", kAllKeys);
   EXPECT_EQ(std::pair(true, std::string(GetParam().inFile)), get(atUsualNic(), GetParam().getter));
 }
 
-TEST_P(ScalarSource, IsTheFileAlsoWhereItLacksTheKey) {
+TEST_P(ScalarSource, IsTheFileEvenIfItLacksTheKey) {
   world_.file("eth0", "ONBOOT=yes\n");
   EXPECT_EQ(std::pair(true, ""s), get(atUsualNic(), GetParam().getter));
 }
 
-TEST_P(ScalarSource, IsTheFileAlsoWhereItsValueIsEmpty) {
+TEST_P(ScalarSource, IsTheFileEvenIfItsValueIsEmpty) {
   world_.file("eth0", GetParam().key + "=\n"s);
   EXPECT_EQ(std::pair(true, ""s), get(atUsualNic(), GetParam().getter));
 }
 
-TEST_P(ScalarSource, IsTheNodeOrNothingWhereThereIsNoFile) {
+TEST_P(ScalarSource, IsTheNodeOrNothingIfThereIsNoFile) {
   EXPECT_EQ(GetParam().fromNode, get(atUsualNic(), GetParam().getter));
 }
 
-TEST_P(ScalarSource, IsNothingWhereTheNodeLacksItToo) {
+TEST_P(ScalarSource, IsNothingIfTheNodeLacksItToo) {
   world_.nic("eth0");
   EXPECT_EQ(GetParam().fromBareNode, get(at(0), GetParam().getter));
 }
 
-TEST_P(ScalarSource, OfTheFileIsTold) {
+TEST_P(ScalarSource, OfTheFileIsLogged) {
   world_.file("eth0", kAllKeys);
   DNSSettingData data = atUsualNic();
   const RecordingLogger logger;
@@ -295,7 +295,7 @@ TEST_P(ScalarSource, OfTheFileIsTold) {
   EXPECT_EQ("get"s + GetParam().label, lines.at(0).function);
 }
 
-TEST_P(ScalarSource, OfTheNodeIsNotTold) {
+TEST_P(ScalarSource, OfTheNodeIsNotLogged) {
   DNSSettingData data = atUsualNic();
   const RecordingLogger logger;
   get(data, GetParam().getter);
@@ -315,36 +315,36 @@ class ServerSource : public DNSSettingDataTest {
   }
 };
 
-TEST_F(ServerSource, IsTheFileWhereThereIsOne) {
+TEST_F(ServerSource, IsTheFileIfThereIsOne) {
   world_.nic("eth0", usualNic()).file("eth0", kAllKeys);
   EXPECT_EQ(std::pair(true, std::vector<std::string>{"192.0.2.1", "2001:db8::1"}), servers());
 }
 
-TEST_F(ServerSource, IsTheFileAlsoWhereItLacksTheKeyOrHasNoElement) {
+TEST_F(ServerSource, IsTheFileEvenIfItLacksTheKeyOrHasNoElement) {
   world_.nic("eth0", usualNic()).file("eth0", "");
   EXPECT_EQ(std::pair(true, std::vector<std::string>()), servers());
   world_.file("eth0", "DNSSERVERS=  \n");
   EXPECT_EQ(std::pair(true, std::vector<std::string>()), servers());
 }
 
-TEST_F(ServerSource, IsTheNodeWhereThereIsNoFile) {
+TEST_F(ServerSource, IsTheNodeIfThereIsNoFile) {
   world_.nic("eth0", usualNic());
   EXPECT_EQ(std::pair(true, std::vector<std::string>{"192.0.2.53"}), servers());
 }
 
-TEST_F(ServerSource, IsNothingWhereTheNodeLacksItToo) {
+TEST_F(ServerSource, IsNothingIfTheNodeLacksItToo) {
   world_.nic("eth0");
   EXPECT_EQ(std::pair(false, std::vector<std::string>()), servers());
 }
 
-TEST_F(ServerSource, LeavesNothingOfWhatWasThereWhereTheNodeLacksItToo) {
+TEST_F(ServerSource, ClearsTheOutputIfTheNodeLacksItToo) {
   world_.nic("eth0");
   std::vector<std::string> values = {"before"};
   EXPECT_FALSE(at(0).getDNSServerAddresses(values));
   EXPECT_THAT(values, IsEmpty());
 }
 
-TEST_F(ServerSource, IsNotTold) {
+TEST_F(ServerSource, IsNotLogged) {
   world_.nic("eth0").file("eth0", kAllKeys);
   DNSSettingData data = at(0);
   const RecordingLogger logger;
@@ -367,7 +367,7 @@ TEST_F(DNSSettingDataTest, SettersOfTheNodeStoreAndLeaveTheFile) {
   EXPECT_EQ(kAllKeys, world_.fileContent("eth0"));
 }
 
-TEST_F(DNSSettingDataTest, SettersOfTheNodeTellThatNothingWasStored) {
+TEST_F(DNSSettingDataTest, SettersOfTheNodeReportThatNothingWasStored) {
   world_.host().install();
   DNSSettingData onNoNode;
   EXPECT_FALSE(onNoNode.setRequestedHostname("newhost"));
@@ -392,7 +392,7 @@ TEST_F(DNSSettingDataTest, SetConfigurationNameSaysTrueAlsoWithoutAFile) {
   EXPECT_EQ(std::nullopt, world_.fileContent("eth0"));
 }
 
-TEST_F(DNSSettingDataTest, SetConfigurationNameTellsTheFileBeforeItWrites) {
+TEST_F(DNSSettingDataTest, SetConfigurationNameLogsTheFileBeforeItWrites) {
   world_.file("eth0", "CONFIG_NAME=office\n");
   DNSSettingData data = atUsualNic();
   const FileAtEachLine file(world_, "eth0");
@@ -400,7 +400,7 @@ TEST_F(DNSSettingDataTest, SetConfigurationNameTellsTheFileBeforeItWrites) {
   EXPECT_THAT(file.contents, ElementsAre("CONFIG_NAME=office\n"s));
 }
 
-TEST_F(DNSSettingDataTest, SetConfigurationNameTellsTheFile) {
+TEST_F(DNSSettingDataTest, SetConfigurationNameLogsTheFile) {
   DNSSettingData data = atUsualNic();
   const RecordingLogger logger;
   data.setConfigurationName("home");

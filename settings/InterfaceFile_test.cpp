@@ -112,7 +112,7 @@ TEST_F(InterfaceFileTest, ItsNameIsDataDirectoryPrefixAndInterfaceWithNothingBet
   EXPECT_EQ(world_.dataDir() + "ifcfg-\xFF.7", interfaceFileName("\xFF.7"));
 }
 
-TEST_F(InterfaceFileTest, ItExistsWhereAFileStands) {
+TEST_F(InterfaceFileTest, ItExistsIfThereIsAFile) {
   EXPECT_FALSE(interfaceFileExists(path_));
   world_.file("eth0", "");
   EXPECT_TRUE(interfaceFileExists(path_));
@@ -129,7 +129,7 @@ TEST_F(InterfaceFileTest, AskingForItMakesNone) {
 
 // --- reading
 
-TEST_F(InterfaceFileTest, AScalarIsTheTextBehindTheEqualsSign) {
+TEST_F(InterfaceFileTest, AScalarIsTheTextAfterTheEqualsSign) {
   EXPECT_EQ("lab.example.org", scalarIn("HOSTNAME=h\nDOMAINNAME=lab.example.org\n", "DOMAINNAME"));
   EXPECT_EQ("a=b", scalarIn("HOSTNAME=a=b\n", "HOSTNAME"));
   EXPECT_EQ("\" x \"\t", scalarIn("HOSTNAME=\" x \"\t\n", "HOSTNAME"));
@@ -207,7 +207,7 @@ TEST_F(InterfaceFileTest, AnAbsentDirectoryStaysAbsent) {
   EXPECT_FALSE(std::filesystem::exists(world_.dataDir()));
 }
 
-TEST_F(InterfaceFileTest, AKeyThatStandsTwiceIsReplacedTwice) {
+TEST_F(InterfaceFileTest, AKeyThatIsThereTwiceIsReplacedTwice) {
   const std::string expected = "HOSTNAME=new\nX=1\nHOSTNAME=new\n";
   EXPECT_TRUE(sameBytes(expected, afterModifyDNSValue("HOSTNAME=a\nX=1\nHOSTNAME=b\n", "HOSTNAME", "new")));
   EXPECT_TRUE(sameBytes(expected, afterModifyValue("HOSTNAME=a\nX=1\nHOSTNAME=b\n", "HOSTNAME", "new")));
@@ -249,7 +249,7 @@ TEST_F(InterfaceFileTest, OfAFileOfZeroLengthModifyValueMakesOneLineAndModifyDNS
   EXPECT_TRUE(sameBytes("", afterModifyDNSValue("", "HOSTNAME", "new")));
 }
 
-TEST_F(InterfaceFileTest, ALastLineWithoutLineFeedGetsOneWhereItIsReplacedAndNoneElse) {
+TEST_F(InterfaceFileTest, ALastLineWithoutLineFeedGetsOneIfItIsReplacedAndNoneElse) {
   EXPECT_TRUE(sameBytes("A=1\nHOSTNAME=new\n", afterModifyDNSValue("A=1\nHOSTNAME=x", "HOSTNAME", "new")));
   EXPECT_TRUE(sameBytes("HOSTNAME=new\nA=1", afterModifyDNSValue("HOSTNAME=x\nA=1", "HOSTNAME", "new")));
 }
@@ -339,7 +339,7 @@ TEST_P(LineLength, OfAnotherKeyStaysByteForByte) {
   }
 }
 
-TEST_P(LineLength, OfTheKeyKeepsWhatLiesBehindTheFirstPiece) {
+TEST_P(LineLength, OfTheKeyKeepsTheTextAfterTheFirstPiece) {
   const std::string line = "HOSTNAME=" + std::string(GetParam() - 9, 'x');
   // The line feed of a line of 510 bytes is in the first piece; that of one of 511 is a piece of its own.
   const std::string rest = GetParam() < kPiece ? "" : line.substr(kPiece) + "\n";
@@ -414,7 +414,7 @@ TEST_F(InterfaceFileTest, ALinkToItselfIsNoFile) {
   EXPECT_TRUE(std::filesystem::is_symlink(path_));
 }
 
-TEST_F(InterfaceFileTest, AFifoReadsAsAnEmptyFileAndHoldsNobodyUp) {
+TEST_F(InterfaceFileTest, AFifoReadsAsAnEmptyFileAndDoesNotBlock) {
   ASSERT_EQ(0, ::mkfifo(path_.c_str(), 0600));
   const Deadline deadline;
   EXPECT_TRUE(interfaceFileExists(path_));
@@ -574,7 +574,7 @@ TEST_F(InterfaceFileTest, RewritesOfLongFilesAndReadersAtOnceAreSafe) {
 
 // --- the log
 
-TEST_F(InterfaceFileTest, ModifyDNSValueTellsFileKeyAndValueBeforeAnything) {
+TEST_F(InterfaceFileTest, ModifyDNSValueLogsFileKeyAndValueFirst) {
   const RecordingLogger logger;
   modifyDNSValue(path_, "HOSTNAME", "new");
   const LogLines lines = logger.pairs();
@@ -585,7 +585,7 @@ TEST_F(InterfaceFileTest, ModifyDNSValueTellsFileKeyAndValueBeforeAnything) {
   for (const LogLine& line : lines) {
     EXPECT_EQ("modifyDNSValue", line.function);
     EXPECT_EQ("settings/InterfaceFile.cpp", line.file);
-    EXPECT_EQ(line.line, line.toldLine());
+    EXPECT_EQ(line.line, line.lineInText());
   }
 }
 

@@ -154,7 +154,7 @@ class AssociationTable : public ::testing::TestWithParam<Row> {
 INSTANTIATE_TEST_SUITE_P(Of, AssociationTable, ::testing::ValuesIn(kRows),
                          [](const auto& row) { return std::string(row.param.className).substr(6); });
 
-TEST_P(AssociationTable, IsWhatInstancesTell) {
+TEST_P(AssociationTable, IsWhatInstancesShow) {
   Lines lines;
   const broker::Status status =
       broker_->enumerateInstances("root/cimv2", GetParam().className, {}, [&](const broker::Instance& association) {
@@ -165,7 +165,7 @@ TEST_P(AssociationTable, IsWhatInstancesTell) {
   EXPECT_THAT(lines, UnorderedElementsAreArray(GetParam().associations));
 }
 
-TEST_P(AssociationTable, IsWhatNamesTell) {
+TEST_P(AssociationTable, IsWhatNamesShow) {
   Lines lines;
   const broker::Status status =
       broker_->enumerateInstanceNames("root/cimv2", GetParam().className, [&](const broker::ObjectPath& association) {

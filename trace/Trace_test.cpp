@@ -147,7 +147,7 @@ TEST(LogPair, LevelsAreFixed) {
                           "4000 VARIABLE number = 3", "3000 ENTERING walk, x=1", "3000 EXITING walk, x=0"));
 }
 
-TEST(ParameterList, ShowsAddressesAndNeverWhatStandsThere) {
+TEST(ParameterList, ShowsAddressesAndNeverTheirContent) {
   const RecordingLogger logger;
   const CMPIBroker broker{};
   const CMPIBroker* const noBroker = nullptr;
@@ -210,7 +210,7 @@ TEST(ProviderMark, ExitIsTheExitingLineAndThenTheBanner) {
   EXPECT_EQ(std::string(78, '='), lines[1].text);
 }
 
-TEST(ProviderMark, LoggerIsToldOfTheMarkerAndNotOfTheProvider) {
+TEST(ProviderMark, LoggerGetsThePlaceOfTheMarkerAndNotOfTheProvider) {
   const RecordingLogger logger;
   markProviderEntry(kLogger, "DNSClient_EnumInstances", "providers/P.cpp", 9);
   markProviderExit(kLogger, "DNSClient_EnumInstances", "providers/P.cpp", 9);
@@ -243,8 +243,8 @@ TEST(ProviderMark, SiteIsTheFunctionItsFileAndItsLine) {
   const LogLines inside = lines.ofFunction("sampleOperation");
   ASSERT_EQ(1U, inside.size());
   EXPECT_EQ("trace/Trace_test.cpp", inside[0].file);
-  EXPECT_EQ(inside[0].line, inside[0].toldLine());
-  EXPECT_EQ(inside[0].line, lines.at(1).toldLine() + 1);
+  EXPECT_EQ(inside[0].line, inside[0].lineInText());
+  EXPECT_EQ(inside[0].line, lines.at(1).lineInText() + 1);
 }
 
 TEST(ProviderMark, LinesOfThreadsStayWhole) {
@@ -259,7 +259,7 @@ TEST(ProviderMark, LinesOfThreadsStayWhole) {
   EXPECT_EQ(4U * 200 * 4, logger.size());
   for (const LogLine& line : logger.lines()) {
     if (line.kind() != LineKind::Banner) {
-      ASSERT_EQ(line.subject(), line.toldFile());
+      ASSERT_EQ(line.subject(), line.fileInText());
     }
   }
 }

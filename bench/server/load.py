@@ -1,18 +1,17 @@
 #!/usr/bin/env python3
-"""Puts zorvacimd under load and holds each figure against its target.
+"""Puts zorvacimd under load and compares each figure with its target.
 
   bench/server/load.py --build build/bench [NAME...]
 
 Throughput is a ratio: requests per second of the server over those of a ceiling, the same bytes served from memory by
 the same HTTP library in the same threading mode: event threads that hand each request to another thread and get it
-back. Beside it stands the ratio to a ceiling whose event threads answer by themselves, which a server of providers
-cannot do: one that hangs would hang all connections of its thread. All are measured by wrk in turns, and the best turn
-of each counts: what else a machine does only takes away, and takes most from who has several threads. Each request
-asks for all properties.
+back. A second ratio is to a ceiling whose event threads answer by themselves. A server of providers cannot do that: a
+hanging provider would block all connections of its thread. wrk measures all of them in turns, and the best turn of each
+counts, because other work on the machine only lowers a figure. Each request asks for all properties.
 
 "hostile" is how long a client waits while others send requests of 3.9 MB of one element, repeated.
 
-NAME picks the figures: few, many, start, memory, endpoints, hostile. Exits 1 where a figure falls short.
+NAME picks the figures: few, many, start, memory, endpoints, hostile. Exits 1 if a figure misses its target.
 """
 
 import argparse
@@ -247,7 +246,7 @@ def hostile(build):
     figures = []
     kinds = sending.bodies()
     with server(build, "zorvacimd") as (_, port):
-        cases = [("nobody", [], 0)] + [(f"1 of {name}", [body], 1) for name, body in kinds.items()]
+        cases = [("no such client", [], 0)] + [(f"1 of {name}", [body], 1) for name, body in kinds.items()]
         for name, some, attackers in cases + [("4 of all kinds", list(kinds.values()), 4)]:
             times, count = sending.latencies_beside(port, some, attackers, 3)
             figures.append(Figure(f"beside {name}: p99, ms", times[int(len(times) * 0.99)],

@@ -119,18 +119,18 @@ const Mi* ProviderLoader::find(const ProviderEntry& entry, std::atomic<const Mi*
 
 void ProviderLoader::makeAll(Provider& provider, MiKind wanted, Status& status) {
   Status unheeded;  // a kind that cannot be made is reported to the request that needs it
-  const auto wants = [&](MiKind kind, bool made) { return (provider.kinds & kind) != 0 && !made; };
+  const auto lacks = [&](MiKind kind, bool made) { return (provider.kinds & kind) != 0 && !made; };
   const auto statusOf = [&](MiKind kind) -> Status& { return kind == wanted ? status : unheeded; };
   const CMPIInstanceMI* instance = provider.instance.load();
   const CMPIAssociationMI* association = provider.association.load();
   const CMPIMethodMI* method = provider.method.load();
-  if (wants(InstanceMi, instance != nullptr)) {
+  if (lacks(InstanceMi, instance != nullptr)) {
     instance = make<CMPIInstanceMI>(provider, "InstanceMI", statusOf(InstanceMi));
   }
-  if (wants(AssociationMi, association != nullptr)) {
+  if (lacks(AssociationMi, association != nullptr)) {
     association = make<CMPIAssociationMI>(provider, "AssociationMI", statusOf(AssociationMi));
   }
-  if (wants(MethodMi, method != nullptr)) method = make<CMPIMethodMI>(provider, "MethodMI", statusOf(MethodMi));
+  if (lacks(MethodMi, method != nullptr)) method = make<CMPIMethodMI>(provider, "MethodMI", statusOf(MethodMi));
   provider.instance.store(instance, std::memory_order_release);
   provider.association.store(association, std::memory_order_release);
   provider.method.store(method, std::memory_order_release);

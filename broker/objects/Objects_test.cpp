@@ -123,7 +123,7 @@ TEST_F(ObjectsTest, NamespaceAndHostCanBeTakenOver) {
   EXPECT_EQ(textOf(to->ft->getHostname(to, nullptr)), "h");
 }
 
-TEST_F(ObjectsTest, APropertyThatNobodySetIsNullAndOneThatTheClassLacksIsNone) {
+TEST_F(ObjectsTest, AnUnsetPropertyIsNullAndOneThatTheClassLacksIsMissing) {
   CMPIInstance* object = instance();
   CMPIData data = get(object, "size");
   EXPECT_EQ(status_.rc, CMPI_RC_OK);
@@ -470,7 +470,7 @@ TEST_F(ObjectsTest, ReleasingWhatIsNoCloneIsHarmless) {
   EXPECT_EQ(textOf(name), "T_Thing");
 }
 
-TEST_F(ObjectsTest, TypesAreTold) {
+TEST_F(ObjectsTest, TypesAreReported) {
   EXPECT_EQ(textOf(cmpi_->eft->getType(cmpi_, path(), &status_)), "CMPIObjectPath");
   EXPECT_EQ(cmpi_->eft->isOfType(cmpi_, path(), "CMPIObjectPath", &status_), 1);
   EXPECT_EQ(cmpi_->eft->isOfType(cmpi_, path(), "CMPIInstance", &status_), 0);
@@ -479,7 +479,7 @@ TEST_F(ObjectsTest, TypesAreTold) {
   EXPECT_EQ(cmpi_->eft->classPathIsA(cmpi_, path("Foreign"), "T_Thing", &status_), 0);
 }
 
-TEST_F(ObjectsTest, WhatIsMadeAfterAMarkGoesAtItsRelease) {
+TEST_F(ObjectsTest, ObjectsMadeAfterAMarkAreFreedAtItsRelease) {
   CMPIInstance* before = instance();
   CMPIGcStat* mark = cmpi_->mft->mark(cmpi_, &status_);
   ASSERT_NE(mark, nullptr);
@@ -492,7 +492,7 @@ TEST_F(ObjectsTest, WhatIsMadeAfterAMarkGoesAtItsRelease) {
   EXPECT_EQ(textOf(get(before, "Name").value.string), "set after the mark");
 }
 
-TEST_F(ObjectsTest, MemoryGoesWithTheScope) {
+TEST_F(ObjectsTest, MemoryIsFreedWithTheScope) {
   auto* block = static_cast<char*>(cmpi_->mft->cmpiCalloc(cmpi_, 4, 4));
   EXPECT_EQ(block[15], 0);
   block[15] = 'x';

@@ -84,7 +84,7 @@ struct Bad {
   const char* message;
 };
 
-TEST(PathText, TellsWhereATextGoesWrongAndWhatWasExpected) {
+TEST(PathText, ReportsTheErrorsPlaceAndWhatWasExpected) {
   const Bad all[] = {
       {"", 0, "expected a class name, found the end of the text"},
       {"9C", 0, "expected a class name, found '9'"},

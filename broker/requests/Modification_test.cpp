@@ -69,12 +69,12 @@ class ModificationTest : public ::testing::Test {
 Property size(std::uint64_t number) { return {"Size", Value::unsignedNumber(number, schema::Type::Uint16)}; }
 Property labels(const std::vector<std::string>& texts) { return {"Labels", Value::textArray(texts)}; }
 
-TEST_F(ModificationTest, HandsOverTheCurrentValuesOfWhatIsNotGiven) {
+TEST_F(ModificationTest, PassesTheCurrentValuesOfPropertiesThatAreNotGiven) {
   expectHanded(modify({size(9)}), "all Size 9 Labels x y");
   expectHanded(modify({labels({"z"})}), "all Size 9 Labels z");
 }
 
-TEST_F(ModificationTest, HandsOverTheCurrentValuesOfWhatIsNotListed) {
+TEST_F(ModificationTest, PassesTheCurrentValuesOfPropertiesThatAreNotListed) {
   expectHanded(modify({size(8), labels({"z"})}, {{"LABELS"}}), "[Labels] Size 7 Labels z");
   expectHanded(modify({size(9)}, {{"Size", "Labels"}}), "[Size Labels] Size 9 Labels z");
 }
@@ -103,7 +103,7 @@ TEST_F(ModificationTest, AWholeInstanceAsItIsChangesNothing) {
   expectHanded(modify(instance.properties), "all Size 8 Labels x y");
 }
 
-TEST_F(ModificationTest, TellsWhatItChangesInTheTypesOfTheSchema) {
+TEST_F(ModificationTest, ReportsItsChangesInTheTypesOfTheSchema) {
   expectHanded(modify({{"SIZE", Value::text("9")}, labels({"x", "y"})}), "all Size 9");
   EXPECT_EQ(effect_.changes, std::vector<Property>{size(9)});
 }

@@ -61,7 +61,7 @@ bool ResultFilter::isServed(const schema::Class& declared) const {
   return entry != nullptr && (entry->kinds & InstanceMi) != 0;
 }
 
-bool ResultFilter::wants(const PropertyInfo& property) const {
+bool ResultFilter::includes(const PropertyInfo& property) const {
   const std::string& name = property.declared->name;
   if (requested_ != nullptr && shape_.localOnly) {
     const schema::Class& origin = *property.declared->origin;
@@ -81,7 +81,7 @@ PropertyMask ResultFilter::maskOf(const ClassInfo& info) {
   }
   std::vector<std::uint64_t> bits(info.properties().size() / 64 + 1);
   for (const PropertyInfo& property : info.properties()) {
-    if (wants(property)) bits[property.index / 64] |= std::uint64_t{1} << (property.index % 64);
+    if (includes(property)) bits[property.index / 64] |= std::uint64_t{1} << (property.index % 64);
   }
   masks_.emplace_back(&info, std::move(bits));
   return {masks_.back().second.data()};

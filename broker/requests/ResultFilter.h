@@ -57,7 +57,7 @@ class ResultFilter : public Receiver {
   /// Logs one line for each class: a provider may return thousands of instances.
   void logDrop(const ClassInfo& info, std::string_view why);
   bool isServed(const schema::Class& declared) const;
-  bool wants(const PropertyInfo& property) const;
+  bool includes(const PropertyInfo& property) const;
   PropertyMask maskOf(const ClassInfo& info);
 
   BrokerCore& core_;

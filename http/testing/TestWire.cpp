@@ -44,7 +44,7 @@ Wire::Wire(int port, int receiveBuffer) : socket_(::socket(AF_INET, SOCK_STREAM 
   address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
   address.sin_port = htons(static_cast<std::uint16_t>(port));
   if (::connect(socket_.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address) != 0) {
-    throw std::runtime_error("nobody listens on port " + std::to_string(port));
+    throw std::runtime_error("no server listens on port " + std::to_string(port));
   }
 }
 

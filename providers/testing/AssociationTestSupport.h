@@ -534,7 +534,7 @@ class AssociationTest : public ::testing::Test {
       const bool isMark = line.function == "markProviderEntry" || line.function == "markProviderExit";
       const std::string function = isMark ? line.subject() : line.function;
       EXPECT_THAT(function, ::testing::AnyOf(operation(name), under.builder)) << line;
-      EXPECT_EQ(under.source, line.toldFile()) << line;
+      EXPECT_EQ(under.source, line.fileInText()) << line;
       EXPECT_EQ(isMark ? "trace/Trace.h" : under.source, line.file) << line;
     }
     return outcome;

@@ -49,7 +49,7 @@ bool isPlainStep(std::string_view line) {
 
 void Phrases::add(const SourceLine& pattern, std::vector<SourceLine> body) {
   if (pattern.text.empty()) throw CaseError(pattern, "a phrase has no words");
-  if (body.empty()) throw CaseError(pattern, "the phrase stands for nothing");
+  if (body.empty()) throw CaseError(pattern, "the phrase has no lines");
   if (isPlainStep(pattern.text)) throw CaseError(pattern, "a phrase cannot look like a call or a line of the log");
   Phrase phrase{pattern, {}, {}, std::move(body)};
   std::size_t from = 0;
@@ -64,7 +64,7 @@ void Phrases::add(const SourceLine& pattern, std::vector<SourceLine> body) {
   phrase.literals.push_back(pattern.text.substr(from));
   for (const Phrase& other : phrases_) {
     if (other.literals == phrase.literals) {
-      throw CaseError(pattern, "the phrase stands at " + placeOf(other.pattern) + " already");
+      throw CaseError(pattern, "the phrase is already at " + placeOf(other.pattern));
     }
   }
   phrases_.push_back(std::move(phrase));
@@ -157,7 +157,7 @@ void Phrases::writeOut(const SourceLine& line, const WrittenLine& as, int depth,
     out.push_back(as);
     return;
   }
-  if (depth == kDeepestPhrase) throw CaseError(as.inCase, "phrases stand for one another without an end");
+  if (depth == kDeepestPhrase) throw CaseError(as.inCase, "phrases contain one another without an end");
   for (const SourceLine& inner : phrase->body) {
     SourceLine next = inner;
     next.text = filledIn(inner.text, filled);
@@ -220,7 +220,7 @@ class Reader {
     while (std::getline(in_, line)) {
       ++number_;
       const SourceLine source{trimmed(line), name_, number_};
-      if (line.find('\t') != std::string::npos) throw CaseError(source, "a tab; \\t stands for one in a text");
+      if (line.find('\t') != std::string::npos) throw CaseError(source, "a tab; write \\t in a text");
       if (source.text.empty() || source.text.front() == '#') continue;
       const bool isHeading = line.front() != ' ';
       if (!isHeading && !heading_.has_value()) throw CaseError(source, "an indented line without a heading before it");

@@ -80,7 +80,7 @@ TEST(CaseFiles, HaveWholeCasesAndAProvider) {
   EXPECT_THAT(errorOf("case: B\nrequest: x\nhappens: x\nends: x\n"), HasSubstr("does not name its provider"));
 }
 
-TEST(PhrasesOfCases, StandForTheirLinesWithPlacesFilled) {
+TEST(PhrasesOfCases, AreReplacedByTheirLinesWithPlacesFilled) {
   EXPECT_THAT(writtenOut("phrase: path <path> of <class>\n  newObjectPath(\"<class>\")\n  <path>.setHostname(\"h\")\n",
                          "path OP1 of X"),
               ElementsAre("newObjectPath(\"X\")", "OP1.setHostname(\"h\")"));
@@ -110,7 +110,7 @@ TEST(PhrasesOfCases, LeaveCallsAndLinesOfTheLogAlone) {
   EXPECT_FALSE(isPlainStep("returnDone"));
 }
 
-TEST(PhrasesOfCases, TellWhereALineOfTheirsStands) {
+TEST(PhrasesOfCases, ReportTheirPlaceInErrors) {
   Phrases all;
   readPhrases("phrase: done\n  returnDone()\n", "p.phrases", all);
 
@@ -125,16 +125,16 @@ TEST(PhrasesOfCases, ThatFitOneLineAreAnError) {
             errorOf([] { writtenOut("phrase: a <x>\n  c()\nphrase: <y> b\n  d()\n", "a b"); }));
 }
 
-TEST(PhrasesOfCases, ThatStandForOneAnotherAreAnError) {
+TEST(PhrasesOfCases, ThatContainOneAnotherAreAnError) {
   EXPECT_THAT(errorOf([] { writtenOut("phrase: a\n  b\nphrase: b\n  a\n", "a"); }),
-              HasSubstr("stand for one another without an end"));
+              HasSubstr("contain one another without an end"));
 }
 
 TEST(PhrasesOfCases, AreRefusedWhereTheyCannotBeUsed) {
   const auto add = [](const std::string& text) { return errorOf([&] { writtenOut(text, "x"); }); };
 
-  EXPECT_THAT(add("phrase: a <x>\n  c()\nphrase: a <y>\n  c()\n"), StartsWith("p.phrases:3: the phrase stands at"));
-  EXPECT_THAT(add("phrase: a\n"), HasSubstr("stands for nothing"));
+  EXPECT_THAT(add("phrase: a <x>\n  c()\nphrase: a <y>\n  c()\n"), StartsWith("p.phrases:3: the phrase is already at"));
+  EXPECT_THAT(add("phrase: a\n"), HasSubstr("the phrase has no lines"));
   EXPECT_THAT(add("phrase:\n  c()\n"), HasSubstr("has no words"));
   EXPECT_THAT(add("phrase: call(<x>)\n  c()\n"), HasSubstr("cannot look like a call"));
   EXPECT_THAT(add("phrase: a <x\n  c()\n"), HasSubstr("has no '>'"));

@@ -70,9 +70,9 @@ std::string stepOf(const LogLine& line, const std::string& dataDir) {
   // The place in the text is the place that the logger got. The exception are the marks of entry and exit: they are
   // logged from a shared header and name the provider's place in their text.
   const bool isMark = line.function == "markProviderEntry" || line.function == "markProviderExit";
-  if (isMark ? line.file != "trace/Trace.h" : line.file != line.toldFile() || line.line != line.toldLine()) {
-    step += " (at " + line.file + ":" + std::to_string(line.line) + ", though the text has " + line.toldFile() + ":" +
-            std::to_string(line.toldLine()) + ")";
+  if (isMark ? line.file != "trace/Trace.h" : line.file != line.fileInText() || line.line != line.lineInText()) {
+    step += " (at " + line.file + ":" + std::to_string(line.line) + ", though the text has " + line.fileInText() + ":" +
+            std::to_string(line.lineInText()) + ")";
   }
   return step;
 }
@@ -336,7 +336,7 @@ std::string difference(const std::vector<WrittenLine>& expected, const std::vect
   if (at == expected.size() && at == actual.size()) return {};
   std::string report = at < expected.size() ? placeOf(expected[at])
                        : expected.empty()   ? placeOf(title)
-                                            : placeOf(expected.back()) + ", behind this line";
+                                            : placeOf(expected.back()) + ", after this line";
   report += ": " + part + "\n";
   for (std::size_t i = at - std::min(at, kContext); i < at; ++i) report += "             " + actual[i] + "\n";
   report += "  expected:  " + (at < expected.size() ? expected[at].text : std::string("nothing more")) + "\n";

@@ -44,9 +44,9 @@ const std::string kModification =
 
 }  // namespace
 
-TEST(CaseRuns, HoldWhereAllIsAsTheCaseSays) { EXPECT_EQ("", resultOf(kRequest + kHappens + kEnds)); }
+TEST(CaseRuns, PassIfAllIsAsTheCaseSays) { EXPECT_EQ("", resultOf(kRequest + kHappens + kEnds)); }
 
-TEST(CaseRuns, TellTheFirstStepThatDiffersWithItsPlaceAndItsPhrase) {
+TEST(CaseRuns, ReportTheFirstStepThatDiffersWithItsPlaceAndItsPhrase) {
   EXPECT_THAT(
       resultOf(kRequest + "happens:\n  enters\n  returnDone()\n  complains\n  leaves\n" + kEnds),
       AllOf(StartsWith("It.cases:6: what happens\n"), HasSubstr("expected:  returnDone()\n"),
@@ -55,27 +55,27 @@ TEST(CaseRuns, TellTheFirstStepThatDiffersWithItsPlaceAndItsPhrase) {
               StartsWith("It.cases:5 (by It.cases:14): what happens\n"));
 }
 
-TEST(CaseRuns, TellStepsThatAreMissingAndStepsTooMany) {
+TEST(CaseRuns, ReportStepsThatAreMissingAndStepsTooMany) {
   EXPECT_THAT(resultOf(kRequest + "happens:\n  enters\n  complains\n  returnDone()\n" + kEnds),
-              AllOf(StartsWith("It.cases:7, behind this line: what happens"), HasSubstr("expected:  nothing more")));
+              AllOf(StartsWith("It.cases:7, after this line: what happens"), HasSubstr("expected:  nothing more")));
   EXPECT_THAT(resultOf(kRequest + kHappens + "  returnDone()\n" + kEnds),
               AllOf(StartsWith("It.cases:9: what happens"), HasSubstr("actual:    nothing more")));
   EXPECT_THAT(resultOf(kRequest + "happens: nothing\n" + kEnds), StartsWith("It.cases:2: what happens"));
 }
 
-TEST(CaseRuns, TellAnotherEnd) {
+TEST(CaseRuns, ReportAnotherEnd) {
   EXPECT_THAT(resultOf(kRequest + kHappens + "ends: CMPI_RC_OK, left open\n"),
               AllOf(StartsWith("It.cases:9: how it ends"), HasSubstr("actual:    CMPI_RC_OK, done, marked")));
 }
 
-TEST(CaseRuns, TellAChangeThatTheCaseDoesNotName) {
+TEST(CaseRuns, ReportAChangeThatTheCaseDoesNotName) {
   const std::string result = resultOf(kModification + "happens: nothing\nends: CMPI_RC_OK, done, not marked\n");
 
   EXPECT_THAT(result, HasSubstr("what changes\n"));
   EXPECT_THAT(result, HasSubstr("actual:    node 1 host = \"new\""));
 }
 
-TEST(CaseRuns, TellWhatTheClientGetsWhereTheCaseSaysSo) {
+TEST(CaseRuns, ReportWhatTheClientGetsIfTheCaseSaysSo) {
   EXPECT_THAT(resultOf(kRequest + kHappens + kEnds + "gives:\n  value uint32 0\n"),
               StartsWith("It.cases:11: what the client gets"));
 }

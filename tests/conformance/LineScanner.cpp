@@ -179,7 +179,7 @@ Path LineScanner::path() {
   Path path("");
   if (take("//")) {
     const std::size_t end = line_.text.find('/', at_);
-    if (end == std::string::npos) fail("a host has no namespace behind it");
+    if (end == std::string::npos) fail("a host has no namespace after it");
     path.host = line_.text.substr(at_, end - at_);
     at_ = end + 1;
   }

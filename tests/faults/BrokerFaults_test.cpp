@@ -43,7 +43,7 @@ class BrokerFaults : public FaultTest {
       EXPECT_TRUE(rc == CMPI_RC_ERR_FAILED || rc == CMPI_RC_ERR_INVALID_PARAMETER) << ending.outcome;
     } else {
       EXPECT_EQ(CMPI_RC_ERR_FAILED, rc) << ending.outcome;
-      EXPECT_TRUE(mode == Mode::SetRc || mode == Mode::RcAndNull) << "a code that nobody gave: " << ending.outcome;
+      EXPECT_TRUE(mode == Mode::SetRc || mode == Mode::RcAndNull) << "an unexpected code: " << ending.outcome;
     }
   }
 
@@ -53,7 +53,7 @@ class BrokerFaults : public FaultTest {
   }
 };
 
-TEST_P(BrokerFaults, EndAsTheBrokerHasItAndLeaveNothingBehind) {
+TEST_P(BrokerFaults, EndAsTheBrokerSaysAndLeaveNothingOver) {
   std::size_t tried = 0;
   for (const Request& request : requests()) {
     for (const Mode mode : kAllStatusModes) {

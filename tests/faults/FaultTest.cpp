@@ -168,7 +168,7 @@ void FaultTest::expectAsEver(const Request& request, const Usual& asUsual, long 
     EXPECT_EQ(asUsual.files, again.files);
   }
   if (HasFailure()) return;  // a failure message takes memory itself
-  EXPECT_EQ(blocks, liveBlocks()) << "memory stays behind";
+  EXPECT_EQ(blocks, liveBlocks()) << "memory is left over";
   EXPECT_EQ(files, openFiles()) << "files stay open";
 }
 
@@ -188,7 +188,7 @@ void FaultTest::expectWellFormed(const Ending& ending, const Usual& asUsual) con
   const auto done =
       std::find_if(calls.begin(), calls.end(), [](const RecordedCall& call) { return call.name == "returnDone"; });
   EXPECT_LE(calls.count("returnDone"), 1U);
-  EXPECT_TRUE(std::none_of(done, calls.end(), isReturn)) << "handed out behind returnDone";
+  EXPECT_TRUE(std::none_of(done, calls.end(), isReturn)) << "returned after returnDone";
   EXPECT_EQ(0U, calls.count("release") + calls.count("free")) << "objects are the broker's to end";
   for (const char* call : {"returnInstance", "returnObjectPath", "returnData"}) {
     EXPECT_LE(calls.count(call), mostResults(call, asUsual)) << call;
@@ -209,7 +209,7 @@ void FaultTest::expectKnownFiles(const Request& request, const Usual& asUsual) c
   for (const auto& [name, content] : now) {
     SCOPED_TRACE(name);
     if (name == "overlay.json") continue;  // written by the agent
-    ASSERT_TRUE(asUsual.files.contains(name) && host_.filesAtFirst().contains(name)) << "a file that nobody made";
+    ASSERT_TRUE(asUsual.files.contains(name) && host_.filesAtFirst().contains(name)) << "an unexpected file";
     const std::vector<std::string> lines = linesOf(content);
     const std::vector<std::string> usualLines = linesOf(asUsual.files.at(name));
     const std::vector<std::string> firstLines = linesOf(host_.filesAtFirst().at(name));

@@ -86,7 +86,7 @@ class FileFaults : public FaultTest {
         EXPECT_NO_THROW(zorva::agent::overlayEntries()) << content;  // complete, with or without each of the values
         continue;
       }
-      ASSERT_TRUE(first != host_.filesAtFirst().end()) << "left behind";
+      ASSERT_TRUE(first != host_.filesAtFirst().end()) << "a file is left over";
       if (failed == FileCall::Fputs || failed == FileCall::Fclose) {
         expectCutShort(content, first->second, usual.files.at(name));
       } else {

@@ -117,7 +117,7 @@ class TreeFaults : public FaultTest {
   }
 };
 
-TEST_P(TreeFaults, FlyOnOrAreHeldBackWhereThatIsSaid) {
+TEST_P(TreeFaults, PassOnOrAreCaughtAsListed) {
   std::size_t tried = 0;
   for (const Request& request : requests()) {
     const std::vector<Fate> fates = fatesOf(request);

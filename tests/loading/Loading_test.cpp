@@ -112,7 +112,7 @@ Held heldNow() {
   return {liveBlocks(), ::mallinfo2().uordblks, ofLibraries, openFiles()};
 }
 
-TEST(LoadCycles, AHundredLeaveNothingBehind) {
+TEST(LoadCycles, AHundredLeaveNothingOver) {
   constexpr int kUntilSettled = 10;
 #ifdef ZORVA_SANITIZED
   constexpr int kCycles = 20;  // each takes ten times as long

@@ -55,7 +55,7 @@ class ChangingHost {
   // Changes the interfaces; called repeatedly by one thread.
   virtual void changeInterfaces(unsigned int step) = 0;
   // Leaves a fixed set of interfaces and returns their names.
-  virtual std::set<std::string> settle() = 0;
+  virtual std::set<std::string> leaveFixedInterfaces() = 0;
 
   // Rewrites, replaces, removes and makes interface files; called repeatedly by another thread.
   void changeFiles(unsigned int step) const {
@@ -87,7 +87,7 @@ class DocumentHost : public ChangingHost {
   DocumentHost() : ChangingHost("file") { write(1); }
 
   void changeInterfaces(unsigned int step) override { write(step % 4); }
-  std::set<std::string> settle() override {
+  std::set<std::string> leaveFixedInterfaces() override {
     write(2);
     return {"nic0", "nic1"};
   }
@@ -133,7 +133,7 @@ class NetworkHost : public ChangingHost {
         return interfaces_.remove("moved");
     }
   }
-  std::set<std::string> settle() override {
+  std::set<std::string> leaveFixedInterfaces() override {
     for (const char* name : {"nic1", "nic2", "moved"}) {
       try {
         interfaces_.remove(name);
@@ -209,7 +209,7 @@ void soak(ChangingHost& host) {
   for (const auto* count : {&load.reads, &load.traversals, &load.changes, &load.methods, &load.objects}) {
     EXPECT_GT(*count, 0U);
   }
-  const std::set<std::string> left = host.settle();
+  const std::set<std::string> left = host.leaveFixedInterfaces();
   EXPECT_EQ(left, textsOfEndpoints(broker, {"Name"})) << "what is seen afterwards is not what is there";
 }
 

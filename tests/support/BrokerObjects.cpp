@@ -7,7 +7,7 @@ namespace ZV::Test {
 namespace {
 
 template <typename Object, typename Face, typename Table>
-Object* behind(const Face* face, const Table& table) {
+Object* objectOfFace(const Face* face, const Table& table) {
   if (face == nullptr || face->ft != &table) return nullptr;
   return static_cast<Object*>(const_cast<Face*>(face));
 }
@@ -151,14 +151,14 @@ bool dropHandle(CMPIData& data) {
 
 }  // namespace
 
-PathObject* ObjectTables::own(const CMPIObjectPath* face) { return behind<PathObject>(face, path); }
-InstanceObject* ObjectTables::own(const CMPIInstance* face) { return behind<InstanceObject>(face, instance); }
-StringObject* ObjectTables::own(const CMPIString* face) { return behind<StringObject>(face, string); }
-ArrayObject* ObjectTables::own(const CMPIArray* face) { return behind<ArrayObject>(face, array); }
-ResultObject* ObjectTables::own(const CMPIResult* face) { return behind<ResultObject>(face, result); }
-ContextObject* ObjectTables::own(const CMPIContext* face) { return behind<ContextObject>(face, context); }
-ArgsObject* ObjectTables::own(const CMPIArgs* face) { return behind<ArgsObject>(face, args); }
-DateTimeObject* ObjectTables::own(const CMPIDateTime* face) { return behind<DateTimeObject>(face, dateTime); }
+PathObject* ObjectTables::own(const CMPIObjectPath* face) { return objectOfFace<PathObject>(face, path); }
+InstanceObject* ObjectTables::own(const CMPIInstance* face) { return objectOfFace<InstanceObject>(face, instance); }
+StringObject* ObjectTables::own(const CMPIString* face) { return objectOfFace<StringObject>(face, string); }
+ArrayObject* ObjectTables::own(const CMPIArray* face) { return objectOfFace<ArrayObject>(face, array); }
+ResultObject* ObjectTables::own(const CMPIResult* face) { return objectOfFace<ResultObject>(face, result); }
+ContextObject* ObjectTables::own(const CMPIContext* face) { return objectOfFace<ContextObject>(face, context); }
+ArgsObject* ObjectTables::own(const CMPIArgs* face) { return objectOfFace<ArgsObject>(face, args); }
+DateTimeObject* ObjectTables::own(const CMPIDateTime* face) { return objectOfFace<DateTimeObject>(face, dateTime); }
 
 std::string ObjectTables::nameOf(const CMPIObjectPath* face) { return nameOfOwn(own(face), face); }
 std::string ObjectTables::nameOf(const CMPIInstance* face) { return nameOfOwn(own(face), face); }

@@ -14,18 +14,18 @@ std::string numberText(CMPICount number) { return std::to_string(number); }
 
 // The object whose face is the first argument of a function of its table.
 template <typename Object, typename Face>
-Object* behind(const Face* face) {
+Object* objectOfFace(const Face* face) {
   return static_cast<Object*>(const_cast<Face*>(face));
 }
-PathObject* self(const CMPIObjectPath* face) { return behind<PathObject>(face); }
-InstanceObject* self(const CMPIInstance* face) { return behind<InstanceObject>(face); }
-StringObject* self(const CMPIString* face) { return behind<StringObject>(face); }
-ArrayObject* self(const CMPIArray* face) { return behind<ArrayObject>(face); }
-EnumerationObject* self(const CMPIEnumeration* face) { return behind<EnumerationObject>(face); }
-ResultObject* self(const CMPIResult* face) { return behind<ResultObject>(face); }
-ContextObject* self(const CMPIContext* face) { return behind<ContextObject>(face); }
-ArgsObject* self(const CMPIArgs* face) { return behind<ArgsObject>(face); }
-DateTimeObject* self(const CMPIDateTime* face) { return behind<DateTimeObject>(face); }
+PathObject* self(const CMPIObjectPath* face) { return objectOfFace<PathObject>(face); }
+InstanceObject* self(const CMPIInstance* face) { return objectOfFace<InstanceObject>(face); }
+StringObject* self(const CMPIString* face) { return objectOfFace<StringObject>(face); }
+ArrayObject* self(const CMPIArray* face) { return objectOfFace<ArrayObject>(face); }
+EnumerationObject* self(const CMPIEnumeration* face) { return objectOfFace<EnumerationObject>(face); }
+ResultObject* self(const CMPIResult* face) { return objectOfFace<ResultObject>(face); }
+ContextObject* self(const CMPIContext* face) { return objectOfFace<ContextObject>(face); }
+ArgsObject* self(const CMPIArgs* face) { return objectOfFace<ArgsObject>(face); }
+DateTimeObject* self(const CMPIDateTime* face) { return objectOfFace<DateTimeObject>(face); }
 
 std::string nameAndValue(const char* name, const CMPIValue* value, CMPIType type) {
   return inQuotesOrNull(name) + ", " + ObjectTables::argument(value, type);

@@ -129,7 +129,7 @@ std::vector<std::string> textsOf(const Outcome& outcome) {
 
 const Path kPath = Path("ZORVA_X").key("Name", "eth0");
 
-TEST(ProviderCall, OutcomeTellsCallsAndLinesInOneOrder) {
+TEST(ProviderCall, OutcomeHasCallsAndLinesInOneOrder) {
   RecordingLogger logger;
   RecordingBroker broker;
   InstanceProvider provider(sample::create, broker);
@@ -164,7 +164,7 @@ TEST(ProviderCall, PropertyListsAreNullOrEmptyOrNames) {
   EXPECT_EQ(sint32(2), provider.getInstance(kPath, {"Name", "Caption"}).instances().at(0)["Asked"]);
 }
 
-TEST(ProviderCall, InstancesAreHandedOver) {
+TEST(ProviderCall, InstancesAreReturned) {
   RecordingBroker broker;
   InstanceProvider provider(sample::create, broker);
   const Instance given = Instance("ZORVA_X").with("List", texts({"a", "b"}));

@@ -57,7 +57,7 @@ bool isAmong(const Names& names, const std::string& name) {
   return std::find(names.begin(), names.end(), name) != names.end();
 }
 
-RecordingBroker* behind(const CMPIBroker* face) { return static_cast<RecordingBroker*>(face->hdl); }
+RecordingBroker* brokerOf(const CMPIBroker* face) { return static_cast<RecordingBroker*>(face->hdl); }
 
 // A slot that this broker does not implement: it says so by its status, if it has one, and returns null.
 CMPIStatus lastStatusOf() { return {CMPI_RC_ERR_NOT_SUPPORTED, nullptr}; }
@@ -147,10 +147,10 @@ CMPIBrokerExtFT* makeThreadTable() {
 }
 
 CMPIGcStat* markMemory(const CMPIBroker* face, CMPIStatus* rc) {
-  return Call(behind(face), "mark", "mark", "").giveNull(rc, CMPI_RC_OK);
+  return Call(brokerOf(face), "mark", "mark", "").giveNull(rc, CMPI_RC_OK);
 }
 CMPIStatus releaseMemory(const CMPIBroker* face, const CMPIGcStat*) {
-  return Call(behind(face), "release", "release", "").status();
+  return Call(brokerOf(face), "release", "release", "").status();
 }
 void* allocate(const CMPIBroker*, std::size_t size) { return std::malloc(size); }
 void* allocateZeroed(const CMPIBroker*, std::size_t count, std::size_t size) { return std::calloc(count, size); }
@@ -161,7 +161,7 @@ void deallocate(const CMPIBroker*, void* memory) { std::free(memory); }
 // Freeing an object is recorded; the object itself lives as long as the broker.
 template <typename Face>
 void freeObject(const CMPIBroker* face, Face*) {
-  Call(behind(face), "free", "free", "").status();
+  Call(brokerOf(face), "free", "free", "").status();
 }
 
 CMPIBrokerMemFT* memoryTable() {
@@ -446,7 +446,7 @@ DateTimeObject* RecordingBroker::addDateTime(std::string text) {
 }
 
 CMPIInstance* BrokerEncapsulation::newInstance(const CMPIBroker* face, const CMPIObjectPath* path, CMPIStatus* rc) {
-  RecordingBroker* broker = behind(face);
+  RecordingBroker* broker = brokerOf(face);
   const Call call(broker, "newInstance", "newInstance", ObjectTables::nameOf(path));
   if (path == nullptr || path->hdl == nullptr) return call.giveNull(rc, CMPI_RC_ERR_INVALID_PARAMETER);
   // The host is not copied: a provider that needs it in a path of the instance has to set it there.
@@ -457,51 +457,51 @@ CMPIInstance* BrokerEncapsulation::newInstance(const CMPIBroker* face, const CMP
 
 CMPIObjectPath* BrokerEncapsulation::newObjectPath(const CMPIBroker* face, const char* space, const char* name,
                                                    CMPIStatus* rc) {
-  RecordingBroker* broker = behind(face);
+  RecordingBroker* broker = brokerOf(face);
   const Call call(broker, "newObjectPath", "newObjectPath", inQuotesOrNull(space) + ", " + inQuotesOrNull(name));
   const Path path(name == nullptr ? "" : name, space == nullptr ? "" : space);
   return call.give([&] { return broker->addPath(path); }, rc);
 }
 
 CMPIArgs* BrokerEncapsulation::newArgs(const CMPIBroker* face, CMPIStatus* rc) {
-  RecordingBroker* broker = behind(face);
+  RecordingBroker* broker = brokerOf(face);
   const Call call(broker, "newArgs", "newArgs", "");
   return call.give([&] { return broker->addArgs({}); }, rc);
 }
 
 CMPIString* BrokerEncapsulation::newString(const CMPIBroker* face, const char* text, CMPIStatus* rc) {
-  RecordingBroker* broker = behind(face);
+  RecordingBroker* broker = brokerOf(face);
   const Call call(broker, "newString", "newString", inQuotesOrNull(text));
   return call.give([&] { return broker->addString(text == nullptr ? "" : text); }, rc);
 }
 
 CMPIArray* BrokerEncapsulation::newArray(const CMPIBroker* face, CMPICount size, CMPIType type, CMPIStatus* rc) {
-  RecordingBroker* broker = behind(face);
+  RecordingBroker* broker = brokerOf(face);
   const Call call(broker, "newArray", "newArray", std::to_string(size) + ", " + nameOfType(type));
   return call.give([&] { return broker->addArray(type, std::vector<Value>(size, null(type))); }, rc);
 }
 
 CMPIDateTime* BrokerEncapsulation::newDateTime(const CMPIBroker* face, CMPIStatus* rc) {
-  RecordingBroker* broker = behind(face);
+  RecordingBroker* broker = brokerOf(face);
   const Call call(broker, "newDateTime", "newDateTime", "");
   return call.give([&] { return broker->addDateTime("20260101000000.000000+000"); }, rc);
 }
 
 CMPIDateTime* BrokerEncapsulation::newDateTimeFromBinary(const CMPIBroker* face, CMPIUint64, CMPIBoolean,
                                                          CMPIStatus* rc) {
-  const Call call(behind(face), "newDateTimeFromBinary", "newDateTimeFromBinary", "");
+  const Call call(brokerOf(face), "newDateTimeFromBinary", "newDateTimeFromBinary", "");
   return call.giveNull(rc, CMPI_RC_ERR_NOT_SUPPORTED);
 }
 
 CMPIDateTime* BrokerEncapsulation::newDateTimeFromChars(const CMPIBroker* face, const char* text, CMPIStatus* rc) {
-  RecordingBroker* broker = behind(face);
+  RecordingBroker* broker = brokerOf(face);
   const Call call(broker, "newDateTimeFromChars", "newDateTimeFromChars", inQuotesOrNull(text));
   return call.give([&] { return broker->addDateTime(text == nullptr ? "" : text); }, rc);
 }
 
 CMPIBoolean BrokerEncapsulation::classPathIsA(const CMPIBroker* face, const CMPIObjectPath* path, const char* type,
                                               CMPIStatus* rc) {
-  const Call call(behind(face), "classPathIsA", "classPathIsA",
+  const Call call(brokerOf(face), "classPathIsA", "classPathIsA",
                   ObjectTables::nameOf(path) + ", " + inQuotesOrNull(type));
   const bool isSame = type != nullptr && sameName(ObjectTables::pathOf(path).className, type);
   return call.giveNumber(static_cast<CMPIBoolean>(isSame), rc);
@@ -509,7 +509,7 @@ CMPIBoolean BrokerEncapsulation::classPathIsA(const CMPIBroker* face, const CMPI
 
 CMPIString* BrokerEncapsulation::getMessage(const CMPIBroker* face, const char* id, const char* text, CMPIStatus* rc,
                                             CMPICount, ...) {
-  RecordingBroker* broker = behind(face);
+  RecordingBroker* broker = brokerOf(face);
   const Call call(broker, "getMessage", "getMessage", inQuotesOrNull(id) + ", " + inQuotesOrNull(text));
   return call.give([&] { return broker->addString(text == nullptr ? "" : text); }, rc);
 }
@@ -521,7 +521,7 @@ CMPIString* BrokerEncapsulation::getMessage2(const CMPIBroker* face, const char*
 
 CMPIStatus BrokerEncapsulation::logMessage(const CMPIBroker* face, int, const char* id, const char* text,
                                            const CMPIString*) {
-  return Call(behind(face), "logMessage", "logMessage", inQuotesOrNull(id) + ", " + inQuotesOrNull(text)).status();
+  return Call(brokerOf(face), "logMessage", "logMessage", inQuotesOrNull(id) + ", " + inQuotesOrNull(text)).status();
 }
 
 CMPIBrokerEncFT BrokerEncapsulation::table = [] {
@@ -576,7 +576,7 @@ Value instanceAsServed(const Instance& instance, const Path& asked) {
 
 CMPIEnumeration* BrokerUpCalls::enumerateInstanceNames(const CMPIBroker* face, const CMPIContext* context,
                                                        const CMPIObjectPath* path, CMPIStatus* rc) {
-  RecordingBroker* broker = behind(face);
+  RecordingBroker* broker = brokerOf(face);
   const Call call(broker, "enumerateInstanceNames", "enumerateInstanceNames", upCallArguments(context, path));
   const Path asked = ObjectTables::pathOf(path);
   const auto served = broker->served_.find(asked.className);
@@ -590,7 +590,7 @@ CMPIEnumeration* BrokerUpCalls::enumerateInstanceNames(const CMPIBroker* face, c
 CMPIEnumeration* BrokerUpCalls::enumerateInstances(const CMPIBroker* face, const CMPIContext* context,
                                                    const CMPIObjectPath* path, const char** properties,
                                                    CMPIStatus* rc) {
-  RecordingBroker* broker = behind(face);
+  RecordingBroker* broker = brokerOf(face);
   const std::string list = properties == nullptr ? "" : ", " + listInQuotes(properties);
   const Call call(broker, "enumerateInstances", "enumerateInstances", upCallArguments(context, path) + list);
   const Path asked = ObjectTables::pathOf(path);
@@ -604,7 +604,7 @@ CMPIEnumeration* BrokerUpCalls::enumerateInstances(const CMPIBroker* face, const
 
 CMPIInstance* BrokerUpCalls::getInstance(const CMPIBroker* face, const CMPIContext* context, const CMPIObjectPath* path,
                                          const char** properties, CMPIStatus* rc) {
-  RecordingBroker* broker = behind(face);
+  RecordingBroker* broker = brokerOf(face);
   const std::string list = properties == nullptr ? "" : ", " + listInQuotes(properties);
   const Call call(broker, "getInstance", "getInstance", upCallArguments(context, path) + list);
   const Path asked = ObjectTables::pathOf(path);

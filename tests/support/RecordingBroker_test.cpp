@@ -104,7 +104,7 @@ TEST(RecordingBroker, NewInstanceForgetsTheHostOfItsPath) {
   EXPECT_EQ("", RecordingBroker::read(CMGetObjectPath(instance, nullptr)).host);
 }
 
-TEST(RecordingBroker, ArrayElementsThatNobodySetAreNull) {
+TEST(RecordingBroker, UnsetArrayElementsAreNull) {
   RecordingBroker broker;
   CMPIArray* array = CMNewArray(broker.cmpi(), 2, CMPI_string, nullptr);
   CMPIString* text = CMNewString(broker.cmpi(), "a", nullptr);
@@ -117,7 +117,7 @@ TEST(RecordingBroker, ArrayElementsThatNobodySetAreNull) {
   EXPECT_EQ(2U, CMGetArrayCount(array, nullptr));
 }
 
-TEST(RecordingBroker, MissingNamesAnswerAsTheTestWantsIt) {
+TEST(RecordingBroker, MissingNamesAnswerAsTheTestSays) {
   RecordingBroker broker;
   broker.missingProperty = {CMPI_RC_OK, CMPI_nullValue};
   CMPIStatus status{};
@@ -194,7 +194,7 @@ TEST(RecordingBroker, UpCallWithAnotherContextSaysSo) {
   EXPECT_THAT(broker.calls().lines(), ElementsAre("enumerateInstanceNames(asked, context null)"));
 }
 
-TEST(RecordingBroker, ServedClassFailsAsTheTestWantsIt) {
+TEST(RecordingBroker, ServedClassFailsAsTheTestSays) {
   RecordingBroker broker;
   const CMPIContext* context = broker.makeContext();
   CMPIObjectPath* asked = broker.make(Path("ZORVA_X"));
@@ -276,14 +276,14 @@ TEST(RecordingBroker, FailingCallIsMarkedInItsLine) {
   EXPECT_THAT(broker.calls().lines(), ElementsAre("newString(\"a\")", "newString(\"b\") fails: rc set and null"));
 }
 
-TEST(RecordingBroker, ThrowsWhereItIsAskedTo) {
+TEST(RecordingBroker, ThrowsIfItIsAskedTo) {
   RecordingBroker broker;
   broker.failNext("newString", Mode::Throw);
   EXPECT_THROW(CMNewString(broker.cmpi(), "a", nullptr), InjectedFailure);
   EXPECT_NE(nullptr, CMNewString(broker.cmpi(), "a", nullptr));
 }
 
-TEST(RecordingBroker, ObjectWithoutHandleRefusesAndStaysAsItIs) {
+TEST(RecordingBroker, ObjectWithoutHandleRefusesAndDoesNotChange) {
   RecordingBroker broker;
   broker.failNext("newObjectPath", Mode::NullHandle);
   CMPIObjectPath* path = CMNewObjectPath(broker.cmpi(), "root/cimv2", "ZORVA_X", nullptr);

@@ -132,7 +132,7 @@ std::string LogLine::parameters() const {
   return withoutAddresses(between(text, kParameters, ""));
 }
 
-std::string LogLine::toldFile() const {
+std::string LogLine::fileInText() const {
   switch (kind()) {
     case LineKind::Entering:
     case LineKind::Exiting:
@@ -152,7 +152,7 @@ std::string LogLine::toldFile() const {
   return {};
 }
 
-int LogLine::toldLine() const {
+int LogLine::lineInText() const {
   const LineKind form = kind();
   if (form == LineKind::Banner || form == LineKind::Other) return 0;
   const std::string_view mark = form == LineKind::Variable ? "' at line " : "Line: ";
@@ -180,7 +180,7 @@ LogLines LogLines::pairs() const {
     const LogLine& first = at(i);
     if (!first.reservedAreEmpty) throw BrokenPair("a reserved argument was given: " + describe(first));
     if (first.stream != zorva::agent::LogStream::Log) throw BrokenPair("nothing in the log before: " + describe(first));
-    if (i + 1 == size()) throw BrokenPair("no trace behind: " + describe(first));
+    if (i + 1 == size()) throw BrokenPair("no trace after: " + describe(first));
     const LogLine& second = at(i + 1);
     if (second.stream != zorva::agent::LogStream::Trace || !second.reservedAreEmpty || !sameArguments(first, second)) {
       throw BrokenPair("the trace differs: " + describe(first) + "\n and then: " + describe(second));
@@ -232,7 +232,7 @@ LogLines LogLines::ofKind(LineKind kind) const {
 
 bool LogLines::has(LineKind kind, std::string_view function, std::string_view file) const {
   return std::any_of(begin(), end(), [&](const LogLine& line) {
-    return line.kind() == kind && line.subject() == function && (file.empty() || line.toldFile() == file);
+    return line.kind() == kind && line.subject() == function && (file.empty() || line.fileInText() == file);
   });
 }
 

@@ -33,8 +33,8 @@ struct LogLine {
   std::string subject() const;     // the function, the message's text, or the variable's name; else the whole text
   std::string value() const;       // of a variable
   std::string parameters() const;  // of a line with a parameter list, addresses as ADDR
-  std::string toldFile() const;    // the file in the text; empty if it names none
-  int toldLine() const;            // the line in the text; 0 if it names none
+  std::string fileInText() const;  // the file in the text; empty if it names none
+  int lineInText() const;          // the line in the text; 0 if it names none
 
   // The line for comparison in a test, without the parts that change from build to build and run to run:
   //   4000 banner

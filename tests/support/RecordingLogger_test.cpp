@@ -58,7 +58,7 @@ TEST(RecordingLogger, ReservedArgumentsMustBeEmpty) {
   EXPECT_THROW(logger.pairs(), BrokenPair);
 }
 
-TEST(RecordingLogger, TellsEachFormOfLine) {
+TEST(RecordingLogger, RecognizesEachFormatOfLine) {
   RecordingLogger logger;
   pair(4000, std::string(78, '='));
   pair(4000, "ENTERING: DNSClient_EnumInstances() in providers/DNSClientProvider.cpp [Line: 12]");
@@ -76,10 +76,10 @@ TEST(RecordingLogger, TellsEachFormOfLine) {
   EXPECT_TRUE(lines.entered("DNSClient_EnumInstances", "providers/DNSClientProvider.cpp"));
   EXPECT_FALSE(lines.entered("DNSClient_EnumInstances", "providers/Other.cpp"));
   EXPECT_TRUE(lines.exited("getAll"));
-  EXPECT_EQ(12, lines[1].toldLine());
-  EXPECT_EQ(5, lines[4].toldLine());
-  EXPECT_EQ("model/DNSClient.cpp", lines[4].toldFile());
-  EXPECT_EQ("a.cpp", lines[5].toldFile());
+  EXPECT_EQ(12, lines[1].lineInText());
+  EXPECT_EQ(5, lines[4].lineInText());
+  EXPECT_EQ("model/DNSClient.cpp", lines[4].fileInText());
+  EXPECT_EQ("a.cpp", lines[5].fileInText());
 }
 
 TEST(RecordingLogger, LinesAreSelectedByWhereTheyComeFrom) {

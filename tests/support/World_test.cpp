@@ -42,7 +42,7 @@ TEST(World, IsWhatTheAgentSees) {
   EXPECT_EQ("myhost", getSystemName());
 }
 
-TEST(World, InterfacesStandUnderTheirSystem) {
+TEST(World, InterfacesAreBelowTheirSystem) {
   World world;
   world.host().nic("eth0").bmc().nic("bmc0", usualNic()).install();
   Instrumentation cursor;
@@ -92,7 +92,7 @@ TEST(World, CanBeAddedToAndInstalledAgain) {
   EXPECT_TRUE(static_cast<bool>(cursor));
 }
 
-TEST(World, HasADataDirectoryOfItsOwnThatGoesWithIt) {
+TEST(World, HasItsOwnDataDirectoryAndRemovesIt) {
   std::string directory;
   {
     World world;
