@@ -4,13 +4,17 @@
 #include <charconv>
 
 #include "broker/objects/PathText.h"
+#include "cimxml/RequestWriter.h"
 #include "cli/Failure.h"
-#include "cli/RequestText.h"
 #include "cli/Text.h"
 
 namespace zorva::cli {
 
 namespace {
+
+using cimxml::fieldText;
+using cimxml::fieldValue;
+using cimxml::IntrinsicCall;
 
 /// A header field that says what went wrong, for a person; empty where it is not there.
 std::string fieldOf(const HttpReply& reply, const char* name) {
@@ -226,7 +230,7 @@ broker::Status RemoteOperations::invokeMethod(const broker::ObjectPath& path, st
   broker::ObjectPath object = path;
   object.host.clear();
   object.nameSpace = nameSpaceOr(path.nameSpace);
-  CimResponse response = ask(method, broker::pathText(object), methodCall(object, method, input));
+  CimResponse response = ask(method, broker::pathText(object), cimxml::methodCall(object, method, input));
   result = std::move(response.method);
   return response.status;
 }

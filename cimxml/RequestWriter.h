@@ -9,7 +9,7 @@
 
 // CIM-XML requests (DSP0201, operations of DSP0200) as they go to a server.
 
-namespace zorva::cli {
+namespace zorva::cimxml {
 
 /// The text of an intrinsic operation, built parameter by parameter. Names that are given empty are left out.
 class IntrinsicCall {
@@ -44,4 +44,4 @@ std::string fieldValue(std::string_view text);
 /// The text that fieldValue came from; a "%" that no two digits follow stands for itself.
 std::string fieldText(std::string_view value);
 
-}  // namespace zorva::cli
+}  // namespace zorva::cimxml

@@ -1,11 +1,11 @@
-#include "cli/RequestText.h"
+#include "cimxml/RequestWriter.h"
 
 #include <charconv>
 
 #include "cimxml/ElementWriter.h"
 #include "schema/Declarations.h"
 
-namespace zorva::cli {
+namespace zorva::cimxml {
 
 namespace {
 
@@ -18,7 +18,7 @@ void appendNamed(std::string& out, std::string_view element, std::string_view na
   out += '<';
   out += element;
   out += " NAME=\"";
-  cimxml::appendEscaped(out, name);
+  appendEscaped(out, name);
   out += '"';
 }
 
@@ -32,7 +32,7 @@ bool isPlain(char c) noexcept {
 IntrinsicCall::IntrinsicCall(std::string_view operation, std::string_view nameSpace) : text_(kBegin) {
   appendNamed(text_, "IMETHODCALL", operation);
   text_ += '>';
-  cimxml::appendLocalNamespacePath(text_, nameSpace);
+  appendLocalNamespacePath(text_, nameSpace);
 }
 
 void IntrinsicCall::begin(std::string_view parameter) {
@@ -53,7 +53,7 @@ IntrinsicCall& IntrinsicCall::className(std::string_view parameter, std::string_
 
 IntrinsicCall& IntrinsicCall::instanceName(std::string_view parameter, const broker::ObjectPath& path) {
   begin(parameter);
-  cimxml::appendInstanceName(text_, path);
+  appendInstanceName(text_, path);
   end();
   return *this;
 }
@@ -61,14 +61,14 @@ IntrinsicCall& IntrinsicCall::instanceName(std::string_view parameter, const bro
 IntrinsicCall& IntrinsicCall::text(std::string_view parameter, std::string_view value) {
   if (value.empty()) return *this;
   begin(parameter);
-  cimxml::appendValue(text_, broker::Value::text(std::string(value)));
+  appendValue(text_, broker::Value::text(std::string(value)));
   end();
   return *this;
 }
 
 IntrinsicCall& IntrinsicCall::boolean(std::string_view parameter, bool value) {
   begin(parameter);
-  cimxml::appendValue(text_, broker::Value::boolean(value));
+  appendValue(text_, broker::Value::boolean(value));
   end();
   return *this;
 }
@@ -76,7 +76,7 @@ IntrinsicCall& IntrinsicCall::boolean(std::string_view parameter, bool value) {
 IntrinsicCall& IntrinsicCall::propertyList(const std::optional<std::vector<std::string>>& names) {
   if (!names) return *this;
   begin("PropertyList");
-  cimxml::appendValue(text_, broker::Value::textArray(*names));
+  appendValue(text_, broker::Value::textArray(*names));
   end();
   return *this;
 }
@@ -84,8 +84,8 @@ IntrinsicCall& IntrinsicCall::propertyList(const std::optional<std::vector<std::
 IntrinsicCall& IntrinsicCall::modifiedInstance(const broker::Instance& instance) {
   begin("ModifiedInstance");
   text_ += "<VALUE.NAMEDINSTANCE>";
-  cimxml::appendInstanceName(text_, instance.path);
-  cimxml::appendInstance(text_, instance);
+  appendInstanceName(text_, instance.path);
+  appendInstance(text_, instance);
   text_ += "</VALUE.NAMEDINSTANCE>";
   end();
   return *this;
@@ -102,15 +102,15 @@ std::string methodCall(const broker::ObjectPath& path, std::string_view method,
   std::string text(kBegin);
   appendNamed(text, "METHODCALL", method);
   text += "><LOCALINSTANCEPATH>";
-  cimxml::appendLocalNamespacePath(text, path.nameSpace);
-  cimxml::appendInstanceName(text, path);
+  appendLocalNamespacePath(text, path.nameSpace);
+  appendInstanceName(text, path);
   text += "</LOCALINSTANCEPATH>";
   for (const broker::NamedValue& each : input) {
     appendNamed(text, "PARAMVALUE", each.name);
     text += " PARAMTYPE=\"";
     text += each.value.type == schema::Type::Reference ? "reference" : schema::typeName(each.value.type);
     text += "\">";
-    cimxml::appendValue(text, each.value);
+    appendValue(text, each.value);
     text += "</PARAMVALUE>";
   }
   text += "</METHODCALL>";
@@ -145,4 +145,4 @@ std::string fieldText(std::string_view value) {
   return out;
 }
 
-}  // namespace zorva::cli
+}  // namespace zorva::cimxml

@@ -1,16 +1,16 @@
-#include "cli/RequestText.h"
+#include "cimxml/RequestWriter.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include "cimxml/testing/Grammar.h"
 
-namespace zorva::cli {
+namespace zorva::cimxml {
 namespace {
 
 using broker::ObjectPath;
 using broker::Value;
-using testing::HasSubstr;
+using ::testing::HasSubstr;
 
 ObjectPath path() {
   ObjectPath far{"h", "root/cimv2", "D", {{"Name", Value::text("a\"<")}}};
@@ -19,7 +19,7 @@ ObjectPath path() {
 
 std::string messageOf(IntrinsicCall call) { return call.message(); }
 
-TEST(RequestText, LeavesOutWhatIsNotGiven) {
+TEST(RequestWriter, LeavesOutWhatIsNotGiven) {
   IntrinsicCall call("Associators", "root/cimv2");
   call.className("AssocClass", "").text("Role", "").propertyList(std::nullopt);
   EXPECT_EQ(messageOf(std::move(call)),
@@ -29,14 +29,14 @@ TEST(RequestText, LeavesOutWhatIsNotGiven) {
             "</LOCALNAMESPACEPATH></IMETHODCALL></SIMPLEREQ></MESSAGE></CIM>\n");
 }
 
-TEST(RequestText, AsksForNoPropertyAtAllByAnEmptyList) {
+TEST(RequestWriter, AsksForNoPropertyAtAllByAnEmptyList) {
   IntrinsicCall call("GetInstance", "n");
   call.propertyList(std::vector<std::string>());
   EXPECT_THAT(call.message(),
               HasSubstr(R"(<IPARAMVALUE NAME="PropertyList"><VALUE.ARRAY></VALUE.ARRAY></IPARAMVALUE>)"));
 }
 
-TEST(RequestText, IsValid) {
+TEST(RequestWriter, IsValid) {
   IntrinsicCall read("Associators", "root/cimv2");
   read.instanceName("ObjectName", path()).className("AssocClass", "CIM_A").text("Role", "<R>").boolean("X", true);
   read.propertyList(std::vector<std::string>{"A", "B"});
@@ -49,7 +49,7 @@ TEST(RequestText, IsValid) {
       path(), "M",
       {{"A", Value::textArray({"x"})}, {"R", Value::reference(path())}, {"N", Value::null(schema::Type::Uint16)}});
   for (const std::string& message : {read.message(), write.message(), call}) {
-    EXPECT_EQ(cimxml::testing::grammarProblem(message), "") << message;
+    EXPECT_EQ(testing::grammarProblem(message), "") << message;
   }
 }
 
@@ -64,4 +64,4 @@ TEST(FieldText, IsWhatFieldValueCameFrom) {
 }
 
 }  // namespace
-}  // namespace zorva::cli
+}  // namespace zorva::cimxml
