@@ -3,9 +3,9 @@
 #include <algorithm>
 
 #include "broker/objects/PathText.h"
+#include "cimxml/HeaderFields.h"
 #include "schema/Names.h"
 #include "schema/Schema.h"
-#include "schema/Utf8.h"
 
 namespace zorva::cimom {
 
@@ -31,39 +31,6 @@ const std::string* find(const http::HttpRequest& request, std::string_view name)
 std::string textOf(const http::HttpRequest& request, std::string_view name) {
   const std::string* value = find(request, name);
   return value != nullptr ? std::string(trimmed(*value)) : std::string();
-}
-
-int hexDigit(char c) noexcept {
-  if (c >= '0' && c <= '9') return c - '0';
-  const char small = schema::lowerAscii(c);
-  return small >= 'a' && small <= 'f' ? small - 'a' + 10 : -1;
-}
-
-bool isUtf8(std::string_view text) noexcept {
-  while (!text.empty()) {
-    const std::size_t length = schema::utf8Length(text);
-    if (length == 0) return false;
-    text.remove_prefix(length);
-  }
-  return true;
-}
-
-/// Decodes "%3A" and the like; nothing if that is not possible, or the result is not UTF-8.
-std::optional<std::string> decoded(std::string_view text) {
-  std::string out;
-  for (std::size_t i = 0; i < text.size(); ++i) {
-    if (text[i] != '%') {
-      out += text[i];
-      continue;
-    }
-    const int high = i + 2 < text.size() ? hexDigit(text[i + 1]) : -1;
-    const int low = high >= 0 ? hexDigit(text[i + 2]) : -1;
-    if (low < 0) return std::nullopt;
-    out += static_cast<char>(static_cast<unsigned char>(high * 16 + low));
-    i += 2;
-  }
-  if (!isUtf8(out)) return std::nullopt;
-  return out;
 }
 
 HttpRefusal mismatch(std::string message) { return {400, "header-mismatch", std::move(message)}; }
@@ -92,7 +59,7 @@ std::optional<HttpRefusal> take(const http::HttpRequest& request, const CimHeade
   for (const auto& [known, text] : request.headers) {
     if (!sameName(known, name) && (prefixed.empty() || !sameName(known, prefixed))) continue;
     if (value) return mismatch("the header " + std::string(name) + " is given twice");
-    value = decoded(trimmed(text));
+    value = cimxml::strictFieldText(trimmed(text));
     if (!value) return mismatch("the header " + std::string(name) + " is not UTF-8 in percent-encoding");
   }
   return std::nullopt;

@@ -1,7 +1,5 @@
 #include "cimxml/RequestWriter.h"
 
-#include <charconv>
-
 #include "cimxml/ElementWriter.h"
 #include "schema/Declarations.h"
 
@@ -17,14 +15,7 @@ constexpr std::string_view kEnd = "</SIMPLEREQ></MESSAGE></CIM>\n";
 void appendNamed(std::string& out, std::string_view element, std::string_view name) {
   out += '<';
   out += element;
-  out += " NAME=\"";
-  appendEscaped(out, name);
-  out += '"';
-}
-
-bool isPlain(char c) noexcept {
-  return (c >= '0' && c <= '9') || (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') ||
-         std::string_view("-._~/:").find(c) != std::string_view::npos;
+  appendAttribute(out, "NAME", name);
 }
 
 }  // namespace
@@ -107,42 +98,15 @@ std::string methodCall(const broker::ObjectPath& path, std::string_view method,
   text += "</LOCALINSTANCEPATH>";
   for (const broker::NamedValue& each : input) {
     appendNamed(text, "PARAMVALUE", each.name);
-    text += " PARAMTYPE=\"";
-    text += each.value.type == schema::Type::Reference ? "reference" : schema::typeName(each.value.type);
-    text += "\">";
+    const bool isReference = each.value.type == schema::Type::Reference;
+    appendAttribute(text, "PARAMTYPE", isReference ? "reference" : schema::typeName(each.value.type));
+    text += '>';
     appendValue(text, each.value);
     text += "</PARAMVALUE>";
   }
   text += "</METHODCALL>";
   text += kEnd;
   return text;
-}
-
-std::string fieldValue(std::string_view text) {
-  constexpr char kDigits[] = "0123456789ABCDEF";
-  std::string out;
-  for (const char c : text) {
-    const auto byte = static_cast<unsigned char>(c);
-    if (isPlain(c)) {
-      out += c;
-    } else {
-      out += {'%', kDigits[byte >> 4U], kDigits[byte & 15U]};
-    }
-  }
-  return out;
-}
-
-std::string fieldText(std::string_view value) {
-  std::string out;
-  while (!value.empty()) {
-    unsigned byte = 0;
-    const char* const digits = value.data() + 1;
-    const bool isEscape =
-        value.starts_with('%') && value.size() > 2 && std::from_chars(digits, digits + 2, byte, 16).ptr == digits + 2;
-    out += isEscape ? static_cast<char>(byte) : value.front();
-    value.remove_prefix(isEscape ? 3 : 1);
-  }
-  return out;
 }
 
 }  // namespace zorva::cimxml

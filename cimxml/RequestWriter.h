@@ -37,11 +37,4 @@ class IntrinsicCall {
 std::string methodCall(const broker::ObjectPath& path, std::string_view method,
                        const std::vector<broker::NamedValue>& input);
 
-/// A text as the value of a header field of DSP0200: "%" and two digits for each byte but letters, digits and some
-/// signs (DSP0200 7.3: such values are percent-encoded UTF-8).
-std::string fieldValue(std::string_view text);
-
-/// The text that fieldValue came from; a "%" that no two digits follow stands for itself.
-std::string fieldText(std::string_view value);
-
 }  // namespace zorva::cimxml

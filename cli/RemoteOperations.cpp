@@ -4,6 +4,7 @@
 #include <charconv>
 
 #include "broker/objects/PathText.h"
+#include "cimxml/HeaderFields.h"
 #include "cimxml/RequestWriter.h"
 #include "cli/Failure.h"
 #include "cli/Text.h"

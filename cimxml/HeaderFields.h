@@ -1,0 +1,21 @@
+#pragma once
+
+#include <optional>
+#include <string>
+#include <string_view>
+
+// The values of the header fields that CIM has over HTTP (DSP0200 1.4): UTF-8 in percent-encoding (7.3). These
+// functions keep no state; each may be called on any thread.
+
+namespace zorva::cimxml {
+
+/// `text` as the value of a field: "%" and two digits for each byte but letters, digits and some signs.
+std::string fieldValue(std::string_view text);
+
+/// The text that fieldValue came from, for a person: a "%" that no two digits follow stands for itself.
+std::string fieldText(std::string_view value);
+
+/// The same for a program: nothing where a "%" lacks its two digits, or the text is no UTF-8.
+std::optional<std::string> strictFieldText(std::string_view value);
+
+}  // namespace zorva::cimxml
