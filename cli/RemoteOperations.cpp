@@ -47,15 +47,14 @@ broker::Status lateStatus(const HttpReply& reply) {
 /// What came before such a failure: all of it where the server has ended the document, as some do; else nothing.
 CimResponse failedResponse(const ServerUrl& server, const HttpReply& reply, broker::Status status,
                            const schema::ClassRepository& classes) {
-  CimResponse response;
-  try {
-    response = readResponse(reply.body, classes);
-    if (!response.status.ok()) return response;
-  } catch (const Failure&) {
+  Expected<CimResponse, ResponseError> response = readResponse(reply.body, classes);
+  if (response && !response->status.ok()) return std::move(*response);
+  if (!response) {
     status.message = "the answer of " + server.shown() + " broke off: " + status.message;
+    response = CimResponse();
   }
-  response.status = std::move(status);
-  return response;
+  response->status = std::move(status);
+  return std::move(*response);
 }
 
 /// A class by itself, with what it inherits in it, as a repository wants it.
@@ -122,7 +121,12 @@ CimResponse RemoteOperations::ask(std::string_view operation, const std::string&
                  message);
   requireSuccess(server_, reply);
   const broker::Status late = lateStatus(reply);
-  return late.ok() ? readResponse(reply.body, *classes_) : failedResponse(server_, reply, late, *classes_);
+  if (!late.ok()) return failedResponse(server_, reply, late, *classes_);
+  Expected<CimResponse, ResponseError> response = readResponse(reply.body, *classes_);
+  if (response) return std::move(*response);
+  throw Failure(ExitCode::Failed,
+                "the answer of the server is no CIM-XML response: " + printable(response.error().message),
+                "does --url name a CIM server (CIM-XML over HTTP, DSP0200)?");
 }
 
 broker::Status RemoteOperations::handOut(CimResponse response, const std::string& nameSpace,

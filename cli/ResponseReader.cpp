@@ -5,8 +5,6 @@
 #include <pugixml.hpp>
 
 #include "cimxml/XmlCheck.h"
-#include "cli/Failure.h"
-#include "cli/Text.h"
 #include "schema/Utf8.h"
 
 namespace zorva::cli {
@@ -19,10 +17,8 @@ using pugi::xml_node;
 constexpr std::size_t kDeepest = 128;
 constexpr std::size_t kMostElements = 20'000'000;
 
-Failure wrongResponse(const std::string& why) {
-  return {ExitCode::Failed, "the answer of the server is no CIM-XML response: " + why,
-          "does --url name a CIM server (CIM-XML over HTTP, DSP0200)?"};
-}
+/// Leaves the reading; readResponse gives it back.
+ResponseError wrongResponse(std::string why) { return {std::move(why)}; }
 
 std::string attribute(const xml_node& node, const char* name) { return node.attribute(name).value(); }
 
@@ -55,7 +51,7 @@ broker::Scalar numberOf(std::string_view text, const std::string& element) {
   const char* const end = digits.data() + digits.size();
   const auto read = std::from_chars(digits.data(), end, number, isHex ? 16 : 10);
   if (read.ec == std::errc() && read.ptr == end) return number;
-  throw wrongResponse("'" + printable(text.substr(0, 60)) + "' in " + element + " is no whole number");
+  throw wrongResponse("'" + std::string(text.substr(0, 60)) + "' in " + element + " is no whole number");
 }
 
 broker::Scalar realOf(std::string_view text, const std::string& element) {
@@ -63,7 +59,7 @@ broker::Scalar realOf(std::string_view text, const std::string& element) {
   double number = 0;
   const auto read = std::from_chars(digits.data(), digits.data() + digits.size(), number);
   if (read.ec == std::errc() && read.ptr == digits.data() + digits.size()) return number;
-  throw wrongResponse("'" + printable(text.substr(0, 60)) + "' in " + element + " is no number");
+  throw wrongResponse("'" + std::string(text.substr(0, 60)) + "' in " + element + " is no number");
 }
 
 broker::Scalar scalarOf(const std::string& text, schema::Type type, const std::string& element) {
@@ -84,7 +80,7 @@ schema::Type typeOf(const xml_node& node, const char* name) {
   if (word.empty()) return schema::Type::String;
   if (schema::sameName(word, "reference")) return schema::Type::Reference;
   if (const auto type = schema::typeFromName(word)) return *type;
-  throw wrongResponse("'" + printable(word) + "' is no CIM type");
+  throw wrongResponse("'" + word + "' is no CIM type");
 }
 
 class Reader {
@@ -305,15 +301,21 @@ class Reader {
 
 }  // namespace
 
-CimResponse readResponse(std::string text, const schema::ClassRepository& classes) {
+Expected<CimResponse, ResponseError> readResponse(std::string text, const schema::ClassRepository& classes) {
   if (const auto problem = cimxml::checkXml(text, {kDeepest, kMostElements})) {
-    throw wrongResponse(cimxml::placeText(text, problem->position) + ": " + printable(problem->message));
+    return unexpected(ResponseError{cimxml::placeText(text, problem->position) + ": " + problem->message});
   }
   pugi::xml_document document;
   const pugi::xml_parse_result parsed = document.load_buffer_inplace(
       text.data(), text.size(), pugi::parse_default | pugi::parse_ws_pcdata_single, pugi::encoding_utf8);
-  if (!parsed) throw wrongResponse("byte " + std::to_string(parsed.offset + 1) + ": " + parsed.description());
-  return Reader(classes).read(document);
+  if (!parsed) {
+    return unexpected(ResponseError{"byte " + std::to_string(parsed.offset + 1) + ": " + parsed.description()});
+  }
+  try {
+    return Reader(classes).read(document);
+  } catch (ResponseError& error) {
+    return unexpected(std::move(error));
+  }
 }
 
 }  // namespace zorva::cli

@@ -5,11 +5,12 @@
 #include <vector>
 
 #include "broker/Broker.h"
+#include "util/Expected.h"
 
 // CIM-XML responses (DSP0201 2.x) as plain values.
 //
 // A server is not trusted: the text is read within bounds of depth, elements that are not known are passed over, and
-// what is no CIM-XML, or breaks off, is a Failure that names the place.
+// what is no CIM-XML, or breaks off, is an error that names the place.
 
 namespace zorva::cli {
 
@@ -22,9 +23,12 @@ struct CimResponse {
   broker::MethodResult method;
 };
 
+struct ResponseError {
+  std::string message;  ///< why the text is no CIM-XML response; has what the server sent in it, as it came
+};
+
 /// Reads a whole response; `text` is used up. Where `classes` knows a class, keys get the types that it declares,
 /// and instances and properties refer to their declarations. What the response leaves out of a path is left empty.
-/// Throws Failure where the text is no CIM-XML response.
-CimResponse readResponse(std::string text, const schema::ClassRepository& classes);
+Expected<CimResponse, ResponseError> readResponse(std::string text, const schema::ClassRepository& classes);
 
 }  // namespace zorva::cli

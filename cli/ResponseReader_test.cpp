@@ -4,7 +4,6 @@
 #include <gtest/gtest.h>
 
 #include "broker/objects/PathText.h"
-#include "cli/Failure.h"
 #include "schema/Schema.h"
 
 namespace zorva::cli {
@@ -12,6 +11,7 @@ namespace {
 
 using broker::Value;
 using testing::HasSubstr;
+using testing::StartsWith;
 
 const schema::ClassRepository& classes() {
   static const auto builtIn = schema::loadBuiltInClasses();
@@ -25,19 +25,14 @@ std::string responseWith(const std::string& content) {
 }
 
 CimResponse read(const std::string& content) {
-  return readResponse(responseWith("<IMETHODRESPONSE NAME=\"X\">" + content + "</IMETHODRESPONSE>"), classes());
+  return readResponse(responseWith("<IMETHODRESPONSE NAME=\"X\">" + content + "</IMETHODRESPONSE>"), classes()).value();
 }
 
 CimResponse results(const std::string& content) { return read("<IRETURNVALUE>" + content + "</IRETURNVALUE>"); }
 
 std::string refusal(const std::string& text) {
-  try {
-    readResponse(text, classes());
-    return {};
-  } catch (const Failure& failure) {
-    EXPECT_EQ(failure.exitCode(), ExitCode::Failed);
-    return failure.what();
-  }
+  const auto response = readResponse(text, classes());
+  return response ? std::string() : response.error().message;
 }
 
 TEST(ResponseReader, ReadsAnError) {
@@ -137,11 +132,14 @@ TEST(ResponseReader, RefersToTheDeclarationsOfClassesThatAreKnown) {
 }
 
 TEST(ResponseReader, ReadsWhatAMethodGaveBack) {
-  const CimResponse response = readResponse(
-      responseWith(R"(<METHODRESPONSE NAME="M"><RETURNVALUE PARAMTYPE="uint32"><VALUE>4</VALUE></RETURNVALUE>)"
-                   R"(<PARAMVALUE NAME="O" PARAMTYPE="string"><VALUE.ARRAY><VALUE>x</VALUE></VALUE.ARRAY></PARAMVALUE>)"
-                   "</METHODRESPONSE>"),
-      classes());
+  const CimResponse response =
+      readResponse(
+          responseWith(
+              R"(<METHODRESPONSE NAME="M"><RETURNVALUE PARAMTYPE="uint32"><VALUE>4</VALUE></RETURNVALUE>)"
+              R"(<PARAMVALUE NAME="O" PARAMTYPE="string"><VALUE.ARRAY><VALUE>x</VALUE></VALUE.ARRAY></PARAMVALUE>)"
+              "</METHODRESPONSE>"),
+          classes())
+          .value();
   EXPECT_EQ(response.method.returnValue, Value::unsignedNumber(4, schema::Type::Uint32));
   ASSERT_EQ(response.method.output.size(), 1U);
   EXPECT_EQ(response.method.output[0].value, Value::textArray({"x"}));
@@ -173,7 +171,7 @@ TEST(ResponseReader, RefusesWhatIsNoResponse) {
   EXPECT_THAT(refusal(responseWith("")), HasSubstr("neither an IMETHODRESPONSE nor a METHODRESPONSE"));
   for (const char* text : {"", "hello", "<CIM>", "<CIM><MESSAGE></CIM>", "<CIM>\xFF</CIM>", "<CIM>&evil;</CIM>",
                            "<!DOCTYPE CIM [<!ENTITY a \"b\">]><CIM>&a;</CIM>"}) {
-    EXPECT_THAT(refusal(text), HasSubstr("is no CIM-XML response")) << text;
+    EXPECT_NE(refusal(text), "") << text;
   }
 }
 
@@ -204,7 +202,7 @@ TEST(ResponseReader, RefusesADepthThatWouldExhaustTheStack) {
     deep += "<KEYBINDING>";
     end += "</KEYBINDING>";
   }
-  EXPECT_THAT(refusal(responseWith(deep + end)), HasSubstr("is no CIM-XML response: line 1, column "));
+  EXPECT_THAT(refusal(responseWith(deep + end)), StartsWith("line 1, column "));
 }
 
 TEST(ResponseReader, EndsWhereverATextIsCut) {

@@ -1,0 +1,21 @@
+#pragma once
+
+#include <tl/expected.hpp>
+#include <type_traits>
+#include <utility>
+
+// What a function gives back that its caller must expect to fail: the value, or what is wrong. Each folder has its own
+// types of errors, which say what is wrong and where.
+
+namespace zorva {
+
+template <typename Value, typename Error>
+using Expected = tl::expected<Value, Error>;
+
+/// An error in the place of a value: `return unexpected(PathTextError{3, "no class"});`
+template <typename Error>
+tl::unexpected<std::decay_t<Error>> unexpected(Error&& error) {
+  return tl::unexpected<std::decay_t<Error>>(std::forward<Error>(error));
+}
+
+}  // namespace zorva
