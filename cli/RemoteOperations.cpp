@@ -13,6 +13,7 @@ namespace zorva::cli {
 
 namespace {
 
+using cimxml::CimResponse;
 using cimxml::fieldText;
 using cimxml::fieldValue;
 using cimxml::IntrinsicCall;
@@ -47,7 +48,7 @@ broker::Status lateStatus(const HttpReply& reply) {
 /// What came before such a failure: all of it where the server has ended the document, as some do; else nothing.
 CimResponse failedResponse(const ServerUrl& server, const HttpReply& reply, broker::Status status,
                            const schema::ClassRepository& classes) {
-  Expected<CimResponse, ResponseError> response = readResponse(reply.body, classes);
+  Expected<CimResponse, cimxml::ResponseError> response = cimxml::readResponse(reply.body, classes);
   if (response && !response->status.ok()) return std::move(*response);
   if (!response) {
     status.message = "the answer of " + server.shown() + " broke off: " + status.message;
@@ -122,7 +123,7 @@ CimResponse RemoteOperations::ask(std::string_view operation, const std::string&
   requireSuccess(server_, reply);
   const broker::Status late = lateStatus(reply);
   if (!late.ok()) return failedResponse(server_, reply, late, *classes_);
-  Expected<CimResponse, ResponseError> response = readResponse(reply.body, *classes_);
+  Expected<CimResponse, cimxml::ResponseError> response = cimxml::readResponse(reply.body, *classes_);
   if (response) return std::move(*response);
   throw Failure(ExitCode::Failed,
                 "the answer of the server is no CIM-XML response: " + printable(response.error().message),

@@ -4,9 +4,9 @@
 #include <memory>
 #include <string>
 
+#include "cimxml/ResponseReader.h"
 #include "cli/HttpClient.h"
 #include "cli/Operations.h"
-#include "cli/ResponseReader.h"
 #include "cli/ServerUrl.h"
 #include "schema/Names.h"
 
@@ -46,9 +46,11 @@ class RemoteOperations : public Operations {
 
  private:
   std::string nameSpaceOr(std::string_view given) const;
-  CimResponse ask(std::string_view operation, const std::string& object, const std::string& message);
-  broker::Status handOut(CimResponse response, const std::string& nameSpace, const broker::InstanceSink& sink) const;
-  broker::Status handOut(CimResponse response, const std::string& nameSpace, const broker::PathSink& sink) const;
+  cimxml::CimResponse ask(std::string_view operation, const std::string& object, const std::string& message);
+  broker::Status handOut(cimxml::CimResponse response, const std::string& nameSpace,
+                         const broker::InstanceSink& sink) const;
+  broker::Status handOut(cimxml::CimResponse response, const std::string& nameSpace,
+                         const broker::PathSink& sink) const;
 
   ServerUrl server_;
   std::shared_ptr<const schema::ClassRepository> classes_;

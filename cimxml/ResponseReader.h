@@ -12,7 +12,7 @@
 // A server is not trusted: the text is read within bounds of depth, elements that are not known are passed over, and
 // what is no CIM-XML, or breaks off, is an error that names the place.
 
-namespace zorva::cli {
+namespace zorva::cimxml {
 
 /// What an operation gave back. Which of the lists has something in it depends on the operation.
 struct CimResponse {
@@ -31,4 +31,4 @@ struct ResponseError {
 /// and instances and properties refer to their declarations. What the response leaves out of a path is left empty.
 Expected<CimResponse, ResponseError> readResponse(std::string text, const schema::ClassRepository& classes);
 
-}  // namespace zorva::cli
+}  // namespace zorva::cimxml

@@ -1,4 +1,4 @@
-#include "cli/ResponseReader.h"
+#include "cimxml/ResponseReader.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
@@ -6,12 +6,12 @@
 #include "broker/objects/PathText.h"
 #include "schema/Schema.h"
 
-namespace zorva::cli {
+namespace zorva::cimxml {
 namespace {
 
 using broker::Value;
-using testing::HasSubstr;
-using testing::StartsWith;
+using ::testing::HasSubstr;
+using ::testing::StartsWith;
 
 const schema::ClassRepository& classes() {
   static const auto builtIn = schema::loadBuiltInClasses();
@@ -216,4 +216,4 @@ TEST(ResponseReader, EndsWhereverATextIsCut) {
 }
 
 }  // namespace
-}  // namespace zorva::cli
+}  // namespace zorva::cimxml

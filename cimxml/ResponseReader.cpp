@@ -1,4 +1,4 @@
-#include "cli/ResponseReader.h"
+#include "cimxml/ResponseReader.h"
 
 #include <charconv>
 #include <optional>
@@ -7,7 +7,7 @@
 #include "cimxml/XmlCheck.h"
 #include "schema/Utf8.h"
 
-namespace zorva::cli {
+namespace zorva::cimxml {
 
 namespace {
 
@@ -302,8 +302,8 @@ class Reader {
 }  // namespace
 
 Expected<CimResponse, ResponseError> readResponse(std::string text, const schema::ClassRepository& classes) {
-  if (const auto problem = cimxml::checkXml(text, {kDeepest, kMostElements})) {
-    return unexpected(ResponseError{cimxml::placeText(text, problem->position) + ": " + problem->message});
+  if (const auto problem = checkXml(text, {kDeepest, kMostElements})) {
+    return unexpected(ResponseError{placeText(text, problem->position) + ": " + problem->message});
   }
   pugi::xml_document document;
   const pugi::xml_parse_result parsed = document.load_buffer_inplace(
@@ -318,4 +318,4 @@ Expected<CimResponse, ResponseError> readResponse(std::string text, const schema
   }
 }
 
-}  // namespace zorva::cli
+}  // namespace zorva::cimxml
