@@ -1,6 +1,7 @@
 #include "cimom/Operations.h"
 #include "cimom/OperationsArguments.h"
 #include "cimxml/ClassWriter.h"
+#include "cimxml/QualifierWriter.h"
 #include "cmpidt.h"
 
 // DSP0200 5.3.2.1 GetClass, .9 EnumerateClasses, .10 EnumerateClassNames, .22 GetQualifier, .24 EnumerateQualifiers.

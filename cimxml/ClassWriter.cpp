@@ -2,37 +2,13 @@
 
 #include <algorithm>
 
-#include "broker/objects/Value.h"
 #include "cimxml/ElementWriter.h"
+#include "cimxml/QualifierWriter.h"
+#include "cimxml/XmlText.h"
 
 namespace zorva::cimxml {
 
 namespace {
-
-broker::Scalar scalarOf(const schema::Scalar& scalar) {
-  return std::visit([](const auto& value) { return broker::Scalar(value); }, scalar);
-}
-
-/// VALUE or VALUE.ARRAY; nothing for null. Of a reference's default value, nothing: the DTD has no place for a path
-/// that is a text.
-void appendSchemaValue(std::string& out, const schema::Value& value, schema::Type type) {
-  if (value.isNull || type == schema::Type::Reference) return;
-  broker::Value plain = broker::Value::null(type, value.isArray);
-  plain.isNull = false;
-  if (!value.isArray) plain.scalar = scalarOf(value.scalar);
-  for (const schema::Scalar& element : value.elements) plain.elements.push_back(scalarOf(element));
-  appendValue(out, plain);
-}
-
-void appendFlag(std::string& out, std::string_view name, bool value, bool unlessSaid) {
-  if (value != unlessSaid) appendAttribute(out, name, value ? "true" : "false");
-}
-
-void appendFlavor(std::string& out, const schema::Flavor& flavor) {
-  appendFlag(out, "OVERRIDABLE", flavor.overridable, true);
-  appendFlag(out, "TOSUBCLASS", flavor.toSubclass, true);
-  appendFlag(out, "TRANSLATABLE", flavor.translatable, false);
-}
 
 /// The attributes that a property or a method has for the class in which it stands.
 void appendOrigin(std::string& out, const schema::Class* origin, const schema::Class& at, const ClassDetail& detail) {
@@ -145,41 +121,6 @@ void appendClassPath(std::string& out, std::string_view host, std::string_view n
   appendNamespacePath(out, host, nameSpace);
   appendClassName(out, name);
   out += "</CLASSPATH>";
-}
-
-void appendQualifiers(std::string& out, const schema::Qualifiers& qualifiers, bool inherited,
-                      const schema::ClassRepository& classes) {
-  for (const schema::Qualifier& qualifier : qualifiers) {
-    const schema::QualifierType* type = classes.findQualifierType(qualifier.name);
-    if (type == nullptr) continue;  // none can be in a class of the repository
-    out += "<QUALIFIER";
-    appendAttribute(out, "NAME", type->name);
-    appendAttribute(out, "TYPE", schema::typeName(type->type));
-    appendFlag(out, "PROPAGATED", inherited || qualifier.propagated, false);
-    appendFlavor(out, qualifier.flavor);
-    out += '>';
-    if (qualifier.value) appendSchemaValue(out, *qualifier.value, type->type);
-    out += "</QUALIFIER>";
-  }
-}
-
-void appendQualifierType(std::string& out, const schema::QualifierType& type) {
-  out += "<QUALIFIER.DECLARATION";
-  appendAttribute(out, "NAME", type.name);
-  appendAttribute(out, "TYPE", schema::typeName(type.type));
-  appendAttribute(out, "ISARRAY", type.isArray ? "true" : "false");
-  if (type.arraySize) appendAttribute(out, "ARRAYSIZE", std::to_string(*type.arraySize));
-  appendFlavor(out, type.flavor);
-  out += "><SCOPE";
-  constexpr std::pair<schema::Scope, std::string_view> kScopes[] = {
-      {schema::ScopeClass, "CLASS"},          {schema::ScopeAssociation, "ASSOCIATION"},
-      {schema::ScopeReference, "REFERENCE"},  {schema::ScopeProperty, "PROPERTY"},
-      {schema::ScopeMethod, "METHOD"},        {schema::ScopeParameter, "PARAMETER"},
-      {schema::ScopeIndication, "INDICATION"}};
-  for (const auto& [bit, name] : kScopes) appendFlag(out, name, (type.scope & bit) != 0, false);
-  out += "/>";
-  appendSchemaValue(out, type.defaultValue, type.type);
-  out += "</QUALIFIER.DECLARATION>";
 }
 
 }  // namespace zorva::cimxml

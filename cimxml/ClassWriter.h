@@ -7,7 +7,7 @@
 
 #include "schema/ClassRepository.h"
 
-// Classes and qualifiers as elements of CIM-XML (DSP0201 2.4, DTD DSP0203 2.4.0). As ElementWriter.h: each function
+// Classes as elements of CIM-XML (DSP0201 2.4, DTD DSP0203 2.4.0). As ElementWriter.h: each function
 // appends one element, keeps no state, and may be called on any thread.
 
 namespace zorva::cimxml {
@@ -30,12 +30,5 @@ void appendClassName(std::string& out, std::string_view name);
 
 /// CLASSPATH.
 void appendClassPath(std::string& out, std::string_view host, std::string_view nameSpace, std::string_view name);
-
-/// A QUALIFIER for each. `inherited`: all are marked as propagated, whatever they say themselves.
-void appendQualifiers(std::string& out, const schema::Qualifiers& qualifiers, bool inherited,
-                      const schema::ClassRepository& classes);
-
-/// QUALIFIER.DECLARATION.
-void appendQualifierType(std::string& out, const schema::QualifierType& type);
 
 }  // namespace zorva::cimxml

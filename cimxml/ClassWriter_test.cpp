@@ -3,6 +3,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "cimxml/QualifierWriter.h"
 #include "schema/Mof.h"
 
 namespace zorva::cimxml {

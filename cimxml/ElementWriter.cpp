@@ -1,111 +1,18 @@
 #include "cimxml/ElementWriter.h"
 
-#include <algorithm>
-#include <array>
-#include <charconv>
-#include <cmath>
-#include <cstdint>
-#include <cstring>
-
-#include "cimxml/ClassWriter.h"
-#include "schema/Utf8.h"
+#include "cimxml/QualifierWriter.h"
+#include "cimxml/XmlText.h"
 
 namespace zorva::cimxml {
 
 namespace {
 
-constexpr std::string_view kReplacement = "\xEF\xBF\xBD";
-
-/// Whether XML 1.0 (2.2) has the character at all.
-bool isXmlCharacter(std::uint32_t code) noexcept {
-  return code == '\t' || code == '\n' || code == '\r' || (code >= 0x20 && code != 0xFFFE && code != 0xFFFF);
-}
-
-/// Bytes that mean nothing to XML and are a character each.
-constexpr std::array<bool, 256> kPlain = [] {
-  std::array<bool, 256> plain{};
-  for (std::size_t byte = 0x20; byte < 0x7F; ++byte) plain[byte] = true;
-  for (const char special : std::string_view("&<>\"")) plain[static_cast<unsigned char>(special)] = false;
-  return plain;
-}();
-
-/// What is written for a character that cannot stand as it is.
-std::string_view standIn(char character) noexcept {
-  switch (character) {
-    case '&':
-      return "&amp;";
-    case '<':
-      return "&lt;";
-    case '>':
-      return "&gt;";
-    case '"':
-      return "&quot;";
-    // A reader would turn these into blanks in an attribute, and a carriage return into a line feed anywhere.
-    case '\t':
-      return "&#9;";
-    case '\n':
-      return "&#10;";
-    case '\r':
-      return "&#13;";
-    case '\x7F':
-      return "\x7F";
-    default:
-      return kReplacement;
-  }
-}
-
-/// How many bytes at the beginning of `text` are surely plain, in whole words of eight: most texts are nothing else.
-std::size_t plainWords(std::string_view text) noexcept {
-  using Word = std::uint64_t;
-  constexpr Word kOnes = 0x0101010101010101;
-  constexpr Word kHighs = 0x8080808080808080;
-  // Sets the high bit of each byte that is 0. Borrows may set others, but only in a word that has such a byte.
-  const auto zeros = [](Word word) { return (word - kOnes) & ~word; };
-  std::size_t done = 0;
-  for (; text.size() - done >= sizeof(Word); done += sizeof(Word)) {
-    Word word = 0;
-    std::memcpy(&word, text.data() + done, sizeof word);
-    const Word low = word - kOnes * 0x20;     // borrows from below 0x20
-    const Word high = word | (word + kOnes);  // 0x7F and above
-    const Word special =
-        zeros(word ^ kOnes * '&') | zeros(word ^ kOnes * '<') | zeros(word ^ kOnes * '>') | zeros(word ^ kOnes * '"');
-    if (((low | high | special) & kHighs) != 0) break;
-  }
-  return done;
-}
-
-void appendUtf16Unit(std::string& out, char16_t unit) {
-  // A lone half of a surrogate pair is no character.
-  if (unit >= 0xD800 && unit <= 0xDFFF) {
-    out += kReplacement;
-    return;
-  }
-  std::string text;
-  schema::utf8Append(text, unit);
-  appendEscaped(out, text);
-}
-
 /// The content of a VALUE or KEYVALUE element.
-class ContentWriter {
+class ContentWriter : public PlainContent {
  public:
-  explicit ContentWriter(std::string& text) : out(text) {}
+  using PlainContent::operator();
+  using PlainContent::PlainContent;
 
-  void operator()(std::monostate) const {}
-  void operator()(bool value) const { out += value ? "TRUE" : "FALSE"; }
-  void operator()(std::uint64_t value) const { number(value); }
-  void operator()(std::int64_t value) const { number(value); }
-  /// DSP0201 5.3.1 wants a decimal point, and has words of its own for what is no number.
-  void operator()(double value) const {
-    if (!std::isfinite(value)) {
-      out += std::isnan(value) ? "NaN" : value > 0 ? "INF" : "-INF";
-      return;
-    }
-    const std::size_t begin = out.size();
-    number(value);
-    if (out.find('.', begin) == std::string::npos) out.insert(std::min(out.find('e', begin), out.size()), ".0");
-  }
-  void operator()(char16_t value) const { appendUtf16Unit(out, value); }
-  void operator()(const std::string& value) const { appendEscaped(out, value); }
   void operator()(const broker::Boxed<broker::ObjectPath>& value) const { appendInstancePath(out, *value); }
   /// An embedded instance is the text of its element, escaped like any text (DSP0201 5.3.2).
   void operator()(const broker::Boxed<broker::Instance>& value) const {
@@ -113,15 +20,6 @@ class ContentWriter {
     appendInstance(element, *value);
     appendEscaped(out, element);
   }
-
- private:
-  template <class Number>
-  void number(Number value) const {
-    char text[32];
-    out.append(text, std::to_chars(text, text + sizeof text, value).ptr);
-  }
-
-  std::string& out;
 };
 
 void appendScalar(std::string& out, const broker::Scalar& scalar, bool isReference) {
@@ -200,38 +98,6 @@ void appendProperty(std::string& out, const broker::Property& property, const br
 }
 
 }  // namespace
-
-void appendAttribute(std::string& out, std::string_view name, std::string_view value) {
-  out += ' ';
-  out += name;
-  out += "=\"";
-  appendEscaped(out, value);
-  out += '"';
-}
-
-void appendEscaped(std::string& out, std::string_view text) {
-  // Nearly all text is plain: it is copied in runs, and only what ends a run is looked at by itself.
-  std::size_t begin = 0;
-  std::size_t i = plainWords(text);
-  while (i < text.size()) {
-    const auto byte = static_cast<unsigned char>(text[i]);
-    if (kPlain[byte]) {
-      ++i;
-      continue;
-    }
-    const std::string_view rest = text.substr(i);
-    const std::size_t length = byte < 0x80 ? 1 : schema::utf8Length(rest);
-    if (byte >= 0x80 && length > 0 && isXmlCharacter(schema::utf8Decode(rest))) {
-      i += length;
-      continue;
-    }
-    out.append(text, begin, i - begin);
-    out += standIn(text[i]);
-    i += length == 0 ? 1 : length;
-    begin = i;
-  }
-  out.append(text, begin, text.size() - begin);
-}
 
 void appendValue(std::string& out, const broker::Value& value) {
   if (value.isNull) return;

@@ -13,12 +13,6 @@
 
 namespace zorva::cimxml {
 
-/// `text` with the characters escaped that mean something to XML, in content and in attributes in double quotes.
-void appendEscaped(std::string& out, std::string_view text);
-
-/// A blank and `name="value"`, the value escaped.
-void appendAttribute(std::string& out, std::string_view name, std::string_view value);
-
 /// VALUE, VALUE.ARRAY, VALUE.REFERENCE or VALUE.REFARRAY. Nothing at all for null.
 void appendValue(std::string& out, const broker::Value& value);
 

@@ -14,12 +14,6 @@ using broker::Property;
 using broker::Scalar;
 using broker::Value;
 
-std::string escaped(std::string_view text) {
-  std::string out;
-  appendEscaped(out, text);
-  return out;
-}
-
 std::string elementOf(const Value& value) {
   std::string out;
   appendValue(out, value);
@@ -39,40 +33,6 @@ std::string instanceElement(const Property& property, bool classOrigin = false) 
   std::string out;
   appendInstance(out, instance, {classOrigin, nullptr});
   return out;
-}
-
-TEST(XmlText, HasNothingThatAnXmlReaderWouldTakeForMarkup) {
-  EXPECT_EQ(escaped(R"(<a href="x">&)"), "&lt;a href=&quot;x&quot;&gt;&amp;");
-}
-
-TEST(XmlText, KeepsLineEndsAndTabsThroughAReader) { EXPECT_EQ(escaped("a\r\n\tb"), "a&#13;&#10;&#9;b"); }
-
-TEST(XmlText, ReplacesWhatXmlCannotHold) {
-  EXPECT_EQ(escaped(std::string("a\x01", 2)), "a\xEF\xBF\xBD");
-  EXPECT_EQ(escaped(std::string("\0b", 2)),
-            "\xEF\xBF\xBD"
-            "b");
-  EXPECT_EQ(escaped("\xFFz"), "\xEF\xBF\xBDz");
-  EXPECT_EQ(escaped("\xEF\xBF\xBE"), "\xEF\xBF\xBD");
-  EXPECT_EQ(escaped("ab\xC3"), "ab\xEF\xBF\xBD");
-  EXPECT_EQ(escaped("a\x7F"), "a\x7F");
-}
-
-TEST(XmlText, LeavesOtherCharactersAsTheyAre) {
-  EXPECT_EQ(escaped("r\xC3\xA9seau \xF0\x9F\x8C\x90"), "r\xC3\xA9seau \xF0\x9F\x8C\x90");
-}
-
-// Long texts are looked at in words: each byte must be seen at each place in one.
-TEST(XmlText, TreatsAByteAlikeWhereverItStands) {
-  const auto alone = [](int byte) { return escaped(std::string(1, static_cast<char>(byte))); };
-  for (int byte = 0; byte < 256; ++byte) {
-    for (std::size_t before = 0; before < 17; ++before) {
-      const std::string left(before, 'a');
-      const std::string right(16 - before, '~');
-      ASSERT_EQ(escaped(left + static_cast<char>(byte) + right), left + alone(byte) + right)
-          << byte << " at " << before;
-    }
-  }
 }
 
 TEST(XmlValue, IsNothingWhereItIsNull) { EXPECT_EQ(elementOf(Value::null(schema::Type::String)), ""); }

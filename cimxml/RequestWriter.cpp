@@ -1,6 +1,7 @@
 #include "cimxml/RequestWriter.h"
 
 #include "cimxml/ElementWriter.h"
+#include "cimxml/XmlText.h"
 #include "schema/Declarations.h"
 
 namespace zorva::cimxml {

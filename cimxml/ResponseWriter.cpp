@@ -2,7 +2,7 @@
 
 #include <utility>
 
-#include "cimxml/ElementWriter.h"
+#include "cimxml/XmlText.h"
 
 namespace zorva::cimxml {
 

@@ -7,6 +7,7 @@
 
 #include "broker/testing/TestClasses.h"
 #include "cimxml/ElementWriter.h"
+#include "cimxml/XmlText.h"
 #include "cimxml/testing/Grammar.h"
 #include "schema/Names.h"
 
