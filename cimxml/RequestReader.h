@@ -1,6 +1,5 @@
 #pragma once
 
-#include <cstddef>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -8,7 +7,7 @@
 #include <vector>
 
 #include "broker/objects/Value.h"
-#include "cimxml/XmlCheck.h"
+#include "cimxml/ReaderLimits.h"
 
 // CIM-XML requests (DSP0201 2.4, operations of DSP0200 1.4) as plain values.
 //
@@ -18,31 +17,6 @@
 // the text alone, within the limits. The function keeps no state and may be called on any thread.
 
 namespace zorva::cimxml {
-
-/// The most that a request may have of each. No request for real classes comes near them; they keep what a request
-/// costs later, in whoever takes its parts one by one, in proportion to its size.
-struct ReaderLimits {
-  XmlLimits xml;
-  std::size_t calls = 100;        ///< SIMPLEREQs in one MULTIREQ
-  std::size_t parameters = 256;   ///< IPARAMVALUEs or PARAMVALUEs in one call
-  std::size_t keys = 256;         ///< KEYBINDINGs in one INSTANCENAME
-  std::size_t properties = 1024;  ///< of each kind of PROPERTY, together, in one INSTANCE
-  std::size_t values = 65'536;    ///< elements in one VALUE.ARRAY or VALUE.REFARRAY
-  std::size_t namespaces = 64;    ///< NAMESPACEs in one LOCALNAMESPACEPATH
-  std::size_t attributes = 32;    ///< of one element
-  std::size_t nameBytes = 1024;   ///< of a name, an ID or a version
-};
-
-/// How DSP0200 6.3 classifies a refusal (the CIMError header).
-enum class Fault {
-  NotWellFormed,
-  NotLooselyValid,
-  UnsupportedCimVersion,
-  UnsupportedDtdVersion,
-  UnsupportedProtocolVersion,
-  UnsupportedOperation,
-  TimeIsOver,  ///< XmlLimits::isOver ended the reading
-};
 
 struct RequestError {
   Fault fault = Fault::NotWellFormed;

@@ -1,0 +1,85 @@
+#pragma once
+
+#include <string>
+#include <string_view>
+
+#include "broker/objects/Value.h"
+#include "cimxml/XmlTree.h"
+#include "schema/ClassRepository.h"
+
+// Names, values and instances (DSP0201 2.4), which requests and responses both have, as plain values. For the readers
+// of this folder alone; the functions throw Refusal.
+//
+// A request is held to its form: what must be there is there, once, and within ReaderLimits. Its values keep the form
+// of the text where only the schema can tell their type; the broker converts them. Of a response, what is missing is
+// left empty; its values get the types that its elements say, and its keys those that the classes declare.
+
+namespace zorva::cimxml {
+
+/// What the elements around a value say about it.
+struct ValueKind {
+  schema::Type type = schema::Type::String;
+  bool isEmbedded = false;
+};
+
+class ElementReader {
+ public:
+  /// Of a request. `limits` must outlive this.
+  explicit ElementReader(const ReaderLimits& limits);
+  /// Of a response. Where `classes`, which must outlive this, knows a class, instances and properties refer to it.
+  explicit ElementReader(const schema::ClassRepository& classes);
+
+  Reading& reading() noexcept { return reading_; }
+
+  /// The value of an attribute; of a response, empty where it is not there.
+  std::string_view attribute(pugi::xml_node node, const char* name) const;
+
+  /// The text of an element, put together from its pieces.
+  std::string content(pugi::xml_node node) const;
+
+  /// LOCALNAMESPACEPATH.
+  std::string nameSpace(pugi::xml_node node) const;
+
+  /// INSTANCENAME, LOCALINSTANCEPATH, INSTANCEPATH, and the same of a class.
+  broker::ObjectPath path(pugi::xml_node node);
+
+  /// INSTANCENAME into a path that may have a namespace already. The only key of a class may come without its name:
+  /// then its name is empty in a request, and the declared one in a response.
+  void instanceName(pugi::xml_node node, broker::ObjectPath& path);
+
+  /// The path in VALUE.REFERENCE.
+  broker::ObjectPath reference(pugi::xml_node node);
+
+  /// INSTANCE.
+  broker::Instance instance(pugi::xml_node node) { return instance(node, 0); }
+
+  /// The type that an attribute names; string where it is not there.
+  schema::Type typeOf(pugi::xml_node node, const char* attribute) const;
+  ValueKind kindOf(pugi::xml_node node, const char* typeAttribute) const;
+
+  /// VALUE, VALUE.ARRAY, VALUE.REFERENCE or VALUE.REFARRAY.
+  broker::Value value(pugi::xml_node node, const ValueKind& kind) { return value(node, kind, 0); }
+
+  /// The first of those in `holder`; null where it has none.
+  broker::Value valueIn(pugi::xml_node holder, const ValueKind& kind);
+
+ private:
+  bool isRequest() const noexcept { return classes_ == nullptr; }
+  pugi::xml_node child(pugi::xml_node node, std::initializer_list<const char*> names) const;
+  const schema::Class* classOf(std::string_view name) const noexcept;
+
+  broker::Value key(pugi::xml_node node, const schema::ClassProperty* declared);
+  broker::Value keyValue(pugi::xml_node node, const schema::ClassProperty* declared);
+  void unnamedKey(pugi::xml_node node, const schema::Class* declared, broker::ObjectPath& path);
+  broker::Instance instance(pugi::xml_node node, int nesting);
+  broker::Property property(pugi::xml_node node, const schema::Class* declared, int nesting);
+  broker::Value value(pugi::xml_node node, const ValueKind& kind, int nesting);
+  broker::Scalar scalar(pugi::xml_node place, std::string text, const ValueKind& kind, int nesting);
+  broker::Scalar requestScalar(pugi::xml_node place, std::string text, const ValueKind& kind, int nesting);
+  broker::Scalar embedded(pugi::xml_node place, const std::string& text, int nesting);
+
+  Reading reading_;
+  const schema::ClassRepository* const classes_;  // null: of a request
+};
+
+}  // namespace zorva::cimxml

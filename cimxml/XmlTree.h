@@ -1,0 +1,97 @@
+#pragma once
+
+#include <cstddef>
+#include <initializer_list>
+#include <pugixml.hpp>
+#include <set>
+#include <string>
+#include <string_view>
+
+#include "cimxml/ReaderLimits.h"
+#include "schema/Names.h"
+
+// A text as a tree of XML elements, the steps of a reader in it, and how a reader refuses what it finds. For the
+// readers of this folder alone.
+
+namespace zorva::cimxml {
+
+/// Thrown to leave the reading. The functions that are called from outside this folder catch it.
+struct Refusal {
+  Fault fault;
+  std::ptrdiff_t position;  ///< in bytes; negative: unknown
+  std::string message;
+};
+
+[[noreturn]] void refuse(pugi::xml_node node, std::string message, Fault fault = Fault::NotLooselyValid);
+
+/// What holds for the reading of one text, those that are embedded in it included.
+class Reading {
+ public:
+  /// `most` must outlive this.
+  explicit Reading(const ReaderLimits& most) : limits(most) {}
+
+  /// To be called for each element, so that the reading ends soon after its time is over.
+  void step();
+
+  const ReaderLimits& limits;
+
+ private:
+  unsigned steps_ = 0;
+};
+
+/// What the elements of this folder's texts are parsed with: everything but comments and processing instructions is
+/// kept, blanks where they are all that an element has.
+inline constexpr unsigned kParseFlags = pugi::parse_cdata | pugi::parse_escapes | pugi::parse_eol |
+                                        pugi::parse_wconv_attribute | pugi::parse_ws_pcdata_single;
+
+/// Checks a text and parses it. `document` refers to `buffer`.
+void parse(std::string_view text, Reading& reading, std::string& buffer, pugi::xml_document& document);
+
+bool is(pugi::xml_node node, const char* name) noexcept;
+
+inline bool isElement(pugi::xml_node node) noexcept { return node.type() == pugi::node_element; }
+
+/// Whether the name of the element is one of several.
+bool isOneOf(pugi::xml_node node, std::initializer_list<const char*> names) noexcept;
+
+/// The name of an element for a message.
+std::string elementName(pugi::xml_node node);
+
+/// The first child element of one of these names; an element that is none of them is passed over.
+pugi::xml_node firstOf(pugi::xml_node node, std::initializer_list<const char*> names);
+
+/// The same; refused where there is none.
+pugi::xml_node required(pugi::xml_node node, std::initializer_list<const char*> names);
+
+/// The text in double quotes for a message, cut to a length that one can read.
+std::string quoted(std::string_view text);
+
+/// `text` without blanks at either end.
+std::string_view trimmed(std::string_view text) noexcept;
+
+/// Counts what an element repeats, and refuses one too many.
+class Count {
+ public:
+  Count(std::size_t most, const char* what) : most_(most), what_(what) {}
+
+  /// `node` is one more, within `outer`.
+  void add(pugi::xml_node node, pugi::xml_node outer);
+
+ private:
+  const std::size_t most_;
+  const char* const what_;
+  std::size_t count_ = 0;
+};
+
+/// Names that may be there only once in one element.
+class UniqueNames {
+ public:
+  /// `name` lives as long as this.
+  void add(pugi::xml_node node, const char* what, std::string_view name);
+
+ private:
+  // An order, not a hash: whoever knows the hash could choose names that collide.
+  std::set<std::string_view, schema::NameLess> names_;
+};
+
+}  // namespace zorva::cimxml
