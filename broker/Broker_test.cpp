@@ -72,10 +72,9 @@ class BrokerTest : public ::testing::Test {
   }
 
   static ObjectPath path(const std::string& text) {
-    ObjectPath read;
-    const auto error = parsePathText(text, read);
-    EXPECT_FALSE(error) << error->message;
-    return read;
+    const auto read = parsePathText(text);
+    EXPECT_TRUE(read) << read.error().message;
+    return read.value_or(ObjectPath());
   }
 
   Instance get(const std::string& text, const Selection& selection = {}, const Caller& caller = {}) {

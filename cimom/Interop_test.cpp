@@ -140,8 +140,7 @@ TEST_F(InteropTest, GetsTheProfileByItsName) {
 }
 
 TEST_F(InteropTest, LinksNamespacesToTheManager) {
-  broker::ObjectPath manager;
-  broker::parsePathText(names("interop", "CIM_ObjectManager").at(0), manager);
+  const broker::ObjectPath manager = broker::parsePathText(names("interop", "CIM_ObjectManager").at(0)).value();
   std::size_t found = 0;
   const auto count = [&](const broker::Instance&) {
     ++found;

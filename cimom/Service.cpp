@@ -157,16 +157,16 @@ class ServiceCore {
       : broker_(broker), options_(std::move(options)), host_(options_.hostName), pulls_(pullLimits(options_)) {}
 
   void handle(const http::HttpRequest& http, http::ResponseSink& sink, broker::Caller caller) {
-    CimHeaders headers;
-    cimxml::CimRequest request;
-    std::optional<HttpRefusal> refusal = readHeaders(http, headers);
-    if (!refusal) refusal = read(http, sink, request);
-    if (!refusal) refusal = checkHeaders(headers, request, broker_);
-    if (refusal) return refuse(*refusal, sink);
-    caller.acceptLanguage = headers.acceptLanguage;
-    caller.contentLanguage = headers.contentLanguage;
-    sink.setLateAnswer(lateAnswer(request, headers));
-    answer(request, {headers, caller, http}, sink);
+    const Expected<CimHeaders, HttpRefusal> headers = readHeaders(http);
+    if (!headers) return refuse(headers.error(), sink);
+    const Expected<cimxml::CimRequest, cimxml::RequestError> request = read(http, sink);
+    if (!request) return refuse(refusalOf(request.error()), sink);
+    const auto checked = checkHeaders(*headers, *request, broker_);
+    if (!checked) return refuse(checked.error(), sink);
+    caller.acceptLanguage = headers->acceptLanguage;
+    caller.contentLanguage = headers->contentLanguage;
+    sink.setLateAnswer(lateAnswer(*request, *headers));
+    answer(*request, {*headers, caller, http}, sink);
   }
 
   void reclaim() { pulls_.reclaim(); }
@@ -181,15 +181,14 @@ class ServiceCore {
   }
 
  private:
-  std::optional<HttpRefusal> read(const http::HttpRequest& http, const http::ResponseSink& sink,
-                                  cimxml::CimRequest& request) {
+  Expected<cimxml::CimRequest, cimxml::RequestError> read(const http::HttpRequest& http,
+                                                          const http::ResponseSink& sink) {
     cimxml::ReaderLimits limits;
     limits.xml.depth = options_.maxDepth;
     limits.xml.isOver = [&sink] { return !sink.isWanted(); };
     limits.calls = options_.maxOperations;
     const Turn turn(largeReads_, http, sink);
-    if (const auto error = cimxml::readRequest(http.body, limits, request)) return refusalOf(*error);
-    return std::nullopt;
+    return cimxml::readRequest(http.body, limits);
   }
 
   void refuse(const HttpRefusal& refusal, http::ResponseSink& sink) const {

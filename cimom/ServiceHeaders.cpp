@@ -33,7 +33,11 @@ std::string textOf(const http::HttpRequest& request, std::string_view name) {
   return value != nullptr ? std::string(trimmed(*value)) : std::string();
 }
 
-HttpRefusal mismatch(std::string message) { return {400, "header-mismatch", std::move(message)}; }
+auto refusal(int status, std::string cimError, std::string message) {
+  return unexpected(HttpRefusal{status, std::move(cimError), std::move(message)});
+}
+
+auto mismatch(std::string message) { return refusal(400, "header-mismatch", std::move(message)); }
 
 /// The number that `Man: http://www.dmtf.org/cim/mapping/http/v1.0 ; ns=73` declares; nothing if it declares none.
 std::optional<std::string> declaredPrefix(const http::HttpRequest& request) {
@@ -53,8 +57,9 @@ std::optional<std::string> declaredPrefix(const http::HttpRequest& request) {
 }
 
 /// One of CIM's own fields: at most once, percent-encoded or not.
-std::optional<HttpRefusal> take(const http::HttpRequest& request, const CimHeaders& headers, std::string_view name,
-                                std::optional<std::string>& value) {
+Expected<std::optional<std::string>, HttpRefusal> take(const http::HttpRequest& request, const CimHeaders& headers,
+                                                       std::string_view name) {
+  std::optional<std::string> value;
   const std::string prefixed = headers.prefix.empty() ? std::string() : headers.prefix + "-" + std::string(name);
   for (const auto& [known, text] : request.headers) {
     if (!sameName(known, name) && (prefixed.empty() || !sameName(known, prefixed))) continue;
@@ -62,12 +67,12 @@ std::optional<HttpRefusal> take(const http::HttpRequest& request, const CimHeade
     value = cimxml::strictFieldText(trimmed(text));
     if (!value) return mismatch("the header " + std::string(name) + " is not UTF-8 in percent-encoding");
   }
-  return std::nullopt;
+  return value;
 }
 
-std::optional<HttpRefusal> checkVersion(const std::optional<std::string>& version) {
-  if (!version || version->starts_with("1.")) return std::nullopt;
-  return HttpRefusal{501, "unsupported-protocol-version", "the header CIMProtocolVersion must be 1.x"};
+Expected<void, HttpRefusal> checkVersion(const std::optional<std::string>& version) {
+  if (!version || version->starts_with("1.")) return {};
+  return refusal(501, "unsupported-protocol-version", "the header CIMProtocolVersion must be 1.x");
 }
 
 /// Whether header and body have the same key values, as far as the schema can say.
@@ -85,33 +90,34 @@ bool sameKeys(const broker::Broker& broker, const broker::ObjectPath& a, const b
   return true;
 }
 
-std::optional<HttpRefusal> checkObject(const std::string& object, const cimxml::Call& call,
-                                       const broker::Broker& broker) {
+Expected<void, HttpRefusal> checkObject(const std::string& object, const cimxml::Call& call,
+                                        const broker::Broker& broker) {
   if (!call.isExtrinsic) {
-    if (schema::sameNamespace(object, call.target.nameSpace)) return std::nullopt;
+    if (schema::sameNamespace(object, call.target.nameSpace)) return {};
     return mismatch("the header CIMObject is " + broker::quotedText(object.substr(0, 200)) +
                     ", but the body has the namespace " + broker::quotedText(call.target.nameSpace.substr(0, 200)));
   }
-  broker::ObjectPath path;
-  if (const auto error = broker::parsePathText(object, path)) {
-    return mismatch("the header CIMObject is no object path: at byte " + std::to_string(error->position) + ", " +
-                    error->message);
+  const auto path = broker::parsePathText(object);
+  if (!path) {
+    return mismatch("the header CIMObject is no object path: at byte " + std::to_string(path.error().position) + ", " +
+                    path.error().message);
   }
-  const bool isSame = schema::sameNamespace(path.nameSpace, call.target.nameSpace) &&
-                      sameName(path.className, call.target.className) &&
-                      (call.onClass || sameKeys(broker, path, call.target));
-  if (isSame) return std::nullopt;
+  const bool isSame = schema::sameNamespace(path->nameSpace, call.target.nameSpace) &&
+                      sameName(path->className, call.target.className) &&
+                      (call.onClass || sameKeys(broker, *path, call.target));
+  if (isSame) return {};
   return mismatch("the header CIMObject names another object than the body: " +
                   broker::quotedText(object.substr(0, 200)));
 }
 
 }  // namespace
 
-std::optional<HttpRefusal> readHeaders(const http::HttpRequest& request, CimHeaders& headers) {
+Expected<CimHeaders, HttpRefusal> readHeaders(const http::HttpRequest& request) {
+  CimHeaders headers;
   headers.isExtended = sameName(request.method, "M-POST");
   std::optional<std::string> prefix = declaredPrefix(request);
   if (headers.isExtended && !prefix) {
-    return HttpRefusal{510, "", "M-POST needs the header Man: " + std::string(kMapping) + " ; ns=NN"};
+    return refusal(510, "", "M-POST needs the header Man: " + std::string(kMapping) + " ; ns=NN");
   }
   headers.prefix = std::move(prefix).value_or("");
   headers.host = textOf(request, "Host");
@@ -120,27 +126,30 @@ std::optional<HttpRefusal> readHeaders(const http::HttpRequest& request, CimHead
   std::optional<std::string> operation;
   std::optional<std::string> batch;
   std::optional<std::string> version;
-  auto refusal = take(request, headers, "CIMOperation", operation);
-  if (!refusal) refusal = take(request, headers, "CIMBatch", batch);
-  if (!refusal) refusal = take(request, headers, "CIMProtocolVersion", version);
-  if (!refusal) refusal = take(request, headers, "CIMMethod", headers.method);
-  if (!refusal) refusal = take(request, headers, "CIMObject", headers.object);
-  if (!refusal) refusal = checkVersion(version);
-  if (refusal) return refusal;
+  const std::pair<const char*, std::optional<std::string>*> fields[] = {{"CIMOperation", &operation},
+                                                                        {"CIMBatch", &batch},
+                                                                        {"CIMProtocolVersion", &version},
+                                                                        {"CIMMethod", &headers.method},
+                                                                        {"CIMObject", &headers.object}};
+  for (const auto& [name, value] : fields) {
+    auto taken = take(request, headers, name);
+    if (!taken) return unexpected(std::move(taken.error()));
+    *value = std::move(*taken);
+  }
+  if (auto checked = checkVersion(version); !checked) return unexpected(std::move(checked.error()));
   headers.isBatch = batch.has_value();
   if (!operation && find(request, "CIMExport") != nullptr) {
-    return HttpRefusal{501, "unsupported-operation", "indications are not taken here"};
+    return refusal(501, "unsupported-operation", "indications are not taken here");
   }
-  if (!operation)
-    return HttpRefusal{400, "header-mismatch", "the header CIMOperation is missing: this is no CIM request"};
-  if (sameName(*operation, "MethodCall")) return std::nullopt;
-  return HttpRefusal{400, "header-mismatch", "the header CIMOperation must be MethodCall"};
+  if (!operation) return mismatch("the header CIMOperation is missing: this is no CIM request");
+  if (!sameName(*operation, "MethodCall")) return mismatch("the header CIMOperation must be MethodCall");
+  return headers;
 }
 
-std::optional<HttpRefusal> checkHeaders(const CimHeaders& headers, const cimxml::CimRequest& request,
-                                        const broker::Broker& broker) {
+Expected<void, HttpRefusal> checkHeaders(const CimHeaders& headers, const cimxml::CimRequest& request,
+                                         const broker::Broker& broker) {
   if (request.isMultiple) {
-    if (!headers.method && !headers.object) return std::nullopt;
+    if (!headers.method && !headers.object) return {};
     return mismatch("the headers CIMMethod and CIMObject go with a single request, but the body is a MULTIREQ");
   }
   if (headers.isBatch) return mismatch("the header CIMBatch needs a MULTIREQ, but the body is a SIMPLEREQ");

@@ -7,6 +7,7 @@
 #include "broker/Broker.h"
 #include "cimxml/RequestReader.h"
 #include "http/Exchange.h"
+#include "util/Expected.h"
 
 // The CIM header fields of HTTP (DSP0200 1.4, 6.3 and 7): reads them, and checks that they agree with the body.
 
@@ -33,11 +34,11 @@ struct CimHeaders {
 };
 
 /// Reads the fields. Refuses a request that is not of CIM, or of another version.
-std::optional<HttpRefusal> readHeaders(const http::HttpRequest& request, CimHeaders& headers);
+Expected<CimHeaders, HttpRefusal> readHeaders(const http::HttpRequest& request);
 
 /// Compares the fields with the body.
-std::optional<HttpRefusal> checkHeaders(const CimHeaders& headers, const cimxml::CimRequest& request,
-                                        const broker::Broker& broker);
+Expected<void, HttpRefusal> checkHeaders(const CimHeaders& headers, const cimxml::CimRequest& request,
+                                         const broker::Broker& broker);
 
 /// The fields of a response with a CIM message as its body.
 http::HeaderList responseHeaders(const CimHeaders& headers);

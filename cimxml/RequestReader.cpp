@@ -117,7 +117,6 @@ void readMessage(xml_node message, ElementReader& reader, CimRequest& request) {
   }
   const xml_node body = required(message, {"SIMPLEREQ", "MULTIREQ"});
   request.isMultiple = is(body, "MULTIREQ");
-  request.calls.clear();
   if (!request.isMultiple) {
     request.calls.push_back(readCall(body, reader));
     return;
@@ -132,7 +131,7 @@ void readMessage(xml_node message, ElementReader& reader, CimRequest& request) {
 
 }  // namespace
 
-std::optional<RequestError> readRequest(std::string_view text, const ReaderLimits& limits, CimRequest& request) {
+Expected<CimRequest, RequestError> readRequest(std::string_view text, const ReaderLimits& limits) {
   std::string buffer;
   pugi::xml_document document;
   ElementReader reader(limits);
@@ -142,13 +141,14 @@ std::optional<RequestError> readRequest(std::string_view text, const ReaderLimit
     if (!is(root, "CIM")) refuse(root, "the root element is " + elementName(root) + ", where CIM is taken");
     checkVersion(root, reader, "CIMVERSION", "2.", Fault::UnsupportedCimVersion);
     checkVersion(root, reader, "DTDVERSION", "2.", Fault::UnsupportedDtdVersion);
+    CimRequest request;
     readMessage(required(root, {"MESSAGE"}), reader, request);
+    return request;
   } catch (Refusal& refusal) {
-    if (refusal.position < 0) return RequestError{refusal.fault, std::move(refusal.message)};
+    if (refusal.position < 0) return unexpected(RequestError{refusal.fault, std::move(refusal.message)});
     const auto position = static_cast<std::size_t>(refusal.position);
-    return RequestError{refusal.fault, placeText(text, position) + ": " + refusal.message};
+    return unexpected(RequestError{refusal.fault, placeText(text, position) + ": " + refusal.message});
   }
-  return std::nullopt;
 }
 
 }  // namespace zorva::cimxml

@@ -8,6 +8,7 @@
 
 #include "broker/objects/Value.h"
 #include "cimxml/ReaderLimits.h"
+#include "util/Expected.h"
 
 // CIM-XML requests (DSP0201 2.4, operations of DSP0200 1.4) as plain values.
 //
@@ -65,7 +66,7 @@ struct CimRequest {
   std::vector<Call> calls;  ///< one, or with `isMultiple` two or more
 };
 
-/// Reads a request. On an error, `request` is left in an unspecified state.
-std::optional<RequestError> readRequest(std::string_view text, const ReaderLimits& limits, CimRequest& request);
+/// Reads a request.
+Expected<CimRequest, RequestError> readRequest(std::string_view text, const ReaderLimits& limits);
 
 }  // namespace zorva::cimxml

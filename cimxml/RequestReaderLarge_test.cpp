@@ -172,9 +172,8 @@ std::vector<Kind> kinds() {
 }
 
 std::string errorOf(const std::string& text) {
-  CimRequest request;
-  const auto error = readRequest(text, {}, request);
-  return error ? error->message : "no error";
+  const auto request = readRequest(text, {});
+  return request ? "no error" : request.error().message;
 }
 
 TEST(LargeRequests, ACapIsNamedInTheError) {
@@ -205,8 +204,7 @@ std::chrono::duration<double> timeToRead(const std::string& text, const ReaderLi
   auto best = std::chrono::duration<double>::max();
   for (int i = 0; i < 3; ++i) {
     const auto begin = std::chrono::steady_clock::now();
-    CimRequest request;
-    readRequest(text, limits, request);
+    const auto request = readRequest(text, limits);
     best = std::min<std::chrono::duration<double>>(best, std::chrono::steady_clock::now() - begin);
   }
   return best;
@@ -233,15 +231,14 @@ TEST(LargeRequests, AreLeftWhenTheirTimeIsOver) {
     int looks = 0;
     ReaderLimits limits;
     limits.xml.isOver = [&] { return ++looks < 0; };
-    CimRequest request;
-    EXPECT_FALSE(readRequest(text, limits, request));
+    EXPECT_TRUE(readRequest(text, limits));
     EXPECT_GT(looks, 0);
     for (const int last : {1, (looks + 1) / 2, looks}) {
       int asked = 0;
       limits.xml.isOver = [&] { return ++asked >= last; };
-      const auto error = readRequest(text, limits, request);
-      ASSERT_TRUE(error);
-      EXPECT_EQ(error->fault, Fault::TimeIsOver);
+      const auto request = readRequest(text, limits);
+      ASSERT_FALSE(request);
+      EXPECT_EQ(request.error().fault, Fault::TimeIsOver);
       EXPECT_EQ(asked, last);
     }
   }

@@ -34,10 +34,9 @@ std::string extrinsic(const std::string& parameters) {
 }
 
 CimRequest read(const std::string& text) {
-  CimRequest request;
-  const auto error = readRequest(text, {}, request);
-  EXPECT_FALSE(error) << error->message;
-  return request;
+  const auto request = readRequest(text, {});
+  EXPECT_TRUE(request) << request.error().message;
+  return request.value_or(CimRequest());
 }
 
 Call readCall(const std::string& content) {
@@ -51,10 +50,9 @@ ParameterValue readParameter(const std::string& value) {
 }
 
 RequestError errorOf(const std::string& text, const ReaderLimits& limits = {}) {
-  CimRequest request;
-  const auto error = readRequest(text, limits, request);
-  EXPECT_TRUE(error) << text;
-  return error.value_or(RequestError());
+  const auto request = readRequest(text, limits);
+  EXPECT_FALSE(request) << text;
+  return request ? RequestError() : request.error();
 }
 
 TEST(RequestReader, ReadsAnIntrinsicCall) {

@@ -145,8 +145,8 @@ class Reader {
 }  // namespace
 
 Expected<CimResponse, ResponseError> readResponse(std::string text, const schema::ClassRepository& classes) {
-  if (const auto problem = checkXml(text, {kDeepest, kMostElements})) {
-    return unexpected(ResponseError{placeText(text, problem->position) + ": " + problem->message});
+  if (const auto checked = checkXml(text, {kDeepest, kMostElements}); !checked) {
+    return unexpected(ResponseError{placeText(text, checked.error().position) + ": " + checked.error().message});
   }
   pugi::xml_document document;
   const pugi::xml_parse_result parsed =

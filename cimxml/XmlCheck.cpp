@@ -24,16 +24,16 @@ class Checker {
  public:
   Checker(std::string_view text, const XmlLimits& limits) : text_(text), limits_(limits) {}
 
-  std::optional<XmlProblem> run() {
-    if (!characters()) return std::move(problem_);
+  Expected<void, XmlProblem> run() {
+    if (!characters()) return unexpected(std::move(problem_));
     if (text_.starts_with("\xEF\xBB\xBF")) at_ = 3;
     nextLook_ = kBytesBetweenLooks;
     while (at_ < text_.size() && goesOn(at_) && content()) {
     }
     if (problem_.message.empty() && depth_ > 0) fail(text_.size(), "the text ends within an element");
     if (problem_.message.empty() && elements_ == 0) fail(text_.size(), "the text has no element");
-    if (problem_.message.empty()) return std::nullopt;
-    return std::move(problem_);
+    if (problem_.message.empty()) return {};
+    return unexpected(std::move(problem_));
   }
 
  private:
@@ -203,7 +203,7 @@ class Checker {
 
 }  // namespace
 
-std::optional<XmlProblem> checkXml(std::string_view text, const XmlLimits& limits) {
+Expected<void, XmlProblem> checkXml(std::string_view text, const XmlLimits& limits) {
   return Checker(text, limits).run();
 }
 

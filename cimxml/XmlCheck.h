@@ -3,9 +3,10 @@
 #include <cstddef>
 #include <cstdint>
 #include <functional>
-#include <optional>
 #include <string>
 #include <string_view>
+
+#include "util/Expected.h"
 
 // What of XML 1.0 the reader behind it does not look at, and bounds on what it builds: a text that passes is
 // well-formed UTF-8 of XML's characters, has one root element, refers to no entity but XML's own five, and is no larger
@@ -31,8 +32,8 @@ struct XmlProblem {
   bool isOver = false;   ///< the reading was ended
 };
 
-/// Nothing where the text passes. Takes time in proportion to the text, and no memory.
-std::optional<XmlProblem> checkXml(std::string_view text, const XmlLimits& limits);
+/// What is wrong with a text, where it does not pass. Takes time in proportion to the text, and no memory.
+Expected<void, XmlProblem> checkXml(std::string_view text, const XmlLimits& limits);
 
 /// "line L, column C" of a byte, both from 1, the column counted in bytes.
 std::string placeText(std::string_view text, std::size_t position);

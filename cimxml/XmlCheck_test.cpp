@@ -10,8 +10,8 @@ using ::testing::HasSubstr;
 
 /// What is wrong with a text; empty where nothing is.
 std::string problemOf(std::string_view text, const XmlLimits& limits = {}) {
-  const auto problem = checkXml(text, limits);
-  return problem ? problem->message : std::string();
+  const auto checked = checkXml(text, limits);
+  return checked ? std::string() : checked.error().message;
 }
 
 std::string bytes(std::string_view text) { return "<a>" + std::string(text) + "</a>"; }
@@ -81,10 +81,10 @@ TEST(XmlCheck, BoundsDepthAndNumberOfElements) {
   EXPECT_EQ(problemOf("<a><a><a/></a></a>", limits), "");
   EXPECT_EQ(problemOf("<a><a><a></a></a></a>", limits), "");
   const auto deep = checkXml("<a><a><a><a></a></a></a></a>", limits);
-  ASSERT_TRUE(deep);
-  EXPECT_TRUE(deep->isLimit);
-  EXPECT_EQ(deep->message, "elements nested deeper than 3");
-  EXPECT_EQ(deep->position, 9U);
+  ASSERT_FALSE(deep);
+  EXPECT_TRUE(deep.error().isLimit);
+  EXPECT_EQ(deep.error().message, "elements nested deeper than 3");
+  EXPECT_EQ(deep.error().position, 9U);
   EXPECT_EQ(problemOf("<a><b/><b/><b/><b/><b/></a>", limits), "more than 5 elements");
 }
 

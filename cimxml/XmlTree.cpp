@@ -57,9 +57,10 @@ void Reading::step() {
 }
 
 void parse(std::string_view text, Reading& reading, std::string& buffer, pugi::xml_document& document) {
-  if (auto problem = checkXml(text, reading.limits.xml)) {
-    if (problem->isOver) throw Refusal{Fault::TimeIsOver, -1, std::move(problem->message)};
-    throw Refusal{Fault::NotWellFormed, static_cast<std::ptrdiff_t>(problem->position), std::move(problem->message)};
+  if (const auto checked = checkXml(text, reading.limits.xml); !checked) {
+    const XmlProblem& problem = checked.error();
+    if (problem.isOver) throw Refusal{Fault::TimeIsOver, -1, problem.message};
+    throw Refusal{Fault::NotWellFormed, static_cast<std::ptrdiff_t>(problem.position), problem.message};
   }
   buffer.assign(text);
   const pugi::xml_parse_result result =

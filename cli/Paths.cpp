@@ -118,12 +118,12 @@ std::vector<broker::ObjectPath> matchingInstances(Session& session, const broker
 }  // namespace
 
 broker::ObjectPath readPath(std::string_view text) {
-  broker::ObjectPath path;
-  const auto error = broker::parsePathText(text, path);
-  if (!error) return path;
+  auto path = broker::parsePathText(text);
+  if (path) return std::move(*path);
+  const broker::PathTextError& error = path.error();
   throw Failure(ExitCode::WrongUsage,
-                "the path is wrong at byte " + std::to_string(error->position + 1) + ": " + printable(error->message) +
-                    "\n" + markedPlace(text, error->position),
+                "the path is wrong at byte " + std::to_string(error.position + 1) + ": " + printable(error.message) +
+                    "\n" + markedPlace(text, error.position),
                 R"(a path looks like ZORVA_DNSProtocolEndPoint.Name="eth0"; quote it for the shell: '...')");
 }
 

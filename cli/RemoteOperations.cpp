@@ -88,9 +88,9 @@ std::unique_ptr<schema::ClassRepository> repositoryOf(schema::ClassDeclaration d
 std::optional<broker::Value> keyValue(const broker::Value& given, const schema::ClassProperty& declared) {
   broker::Value value = given;
   if (declared.type == schema::Type::Reference && given.type == schema::Type::String) {
-    broker::ObjectPath path;
-    if (broker::parsePathText(given.asText(), path)) return std::nullopt;
-    return broker::Value::reference(std::move(path));
+    auto path = broker::parsePathText(given.asText());
+    if (!path) return std::nullopt;
+    return broker::Value::reference(std::move(*path));
   }
   const bool isNumber = std::holds_alternative<std::uint64_t>(given.scalar);
   if (schema::isSigned(declared.type) && isNumber) {

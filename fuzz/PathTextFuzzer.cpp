@@ -6,22 +6,22 @@
 #include "broker/objects/PathText.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
-  using zorva::broker::ObjectPath;
   const std::string_view text(reinterpret_cast<const char*>(data), size);
-  ObjectPath path;
-  if (const auto error = zorva::broker::parsePathText(text, path)) {
-    if (error->message.empty() || error->position > size) std::abort();
+  const auto path = zorva::broker::parsePathText(text);
+  if (!path) {
+    if (path.error().message.empty() || path.error().position > size) std::abort();
     return 0;
   }
-  const std::string first = zorva::broker::pathText(path);
+  const std::string first = zorva::broker::pathText(*path);
   if (first.size() > zorva::broker::kMaxPathText) return 0;  // escapes may have made it too long
-  ObjectPath again;
-  if (const auto error = zorva::broker::parsePathText(first, again)) {
-    std::fprintf(stderr, "%s at byte %zu: %s\n", error->message.c_str(), error->position, first.c_str());
+  const auto again = zorva::broker::parsePathText(first);
+  if (!again) {
+    const auto& error = again.error();
+    std::fprintf(stderr, "%s at byte %zu: %s\n", error.message.c_str(), error.position, first.c_str());
     std::abort();
   }
-  if (zorva::broker::pathText(again) != first) {
-    std::fprintf(stderr, "%s\n%s\n", first.c_str(), zorva::broker::pathText(again).c_str());
+  if (zorva::broker::pathText(*again) != first) {
+    std::fprintf(stderr, "%s\n%s\n", first.c_str(), zorva::broker::pathText(*again).c_str());
     std::abort();
   }
   return 0;

@@ -53,16 +53,17 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   static broker::Broker broker(schema::loadBuiltInClasses(schema::ClassSet::Interop), options());
   static cimom::Service service(broker);
   std::string body(reinterpret_cast<const char*>(data), size);
-  cimxml::CimRequest read;
-  if (const auto error = cimxml::readRequest(body, {}, read)) {
-    if (error->message.empty()) fail("an error without a message", body);
+  const auto read = cimxml::readRequest(body, {});
+  if (!read) {
+    if (read.error().message.empty()) fail("an error without a message", body);
     return 0;
   }
   Sink sink;
-  service.handle(requestOf(std::move(body), read), sink);
+  service.handle(requestOf(std::move(body), *read), sink);
   if (!sink.begun()) fail("no response", sink.body);
   if (sink.status != 200 || sink.failed) return 0;
   const cimxml::XmlLimits kLimits{1000, 10'000'000};
-  if (const auto problem = cimxml::checkXml(sink.body, kLimits)) fail(problem->message.c_str(), sink.body);
+  const auto checked = cimxml::checkXml(sink.body, kLimits);
+  if (!checked) fail(checked.error().message.c_str(), sink.body);
   return 0;
 }

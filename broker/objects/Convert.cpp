@@ -278,11 +278,11 @@ class ScalarMaker {
 
   /// A text given for a reference.
   std::string reference(const std::string& text) {
-    ObjectPath path;
-    if (const auto error = parsePathText(text, path)) {
-      return "no object path: at byte " + std::to_string(error->position) + ", " + error->message;
+    auto path = parsePathText(text);
+    if (!path) {
+      return "no object path: at byte " + std::to_string(path.error().position) + ", " + path.error().message;
     }
-    return (*this)(Boxed<ObjectPath>(std::move(path)));
+    return (*this)(Boxed<ObjectPath>(std::move(*path)));
   }
 
   /// A text given for a number, a boolean or a character.

@@ -40,16 +40,17 @@ class Reader {
  public:
   explicit Reader(std::string_view text) : text_(text) {}
 
-  std::optional<PathTextError> read(ObjectPath& path) {
-    path = ObjectPath();
+  Expected<ObjectPath, PathTextError> read() {
     if (text_.size() > kMaxPathText) {
-      return PathTextError{kMaxPathText, "the path is " + std::to_string(text_.size()) + " bytes long; at most " +
-                                             std::to_string(kMaxPathText) + " are read"};
+      return unexpected(PathTextError{kMaxPathText, "the path is " + std::to_string(text_.size()) +
+                                                        " bytes long; at most " + std::to_string(kMaxPathText) +
+                                                        " are read"});
     }
+    ObjectPath path;
     if (readHost(path) && readNameSpace(path) && readName("a class name", path.className) && readKeys(path)) {
-      return std::nullopt;
+      return path;
     }
-    return std::move(error_);
+    return unexpected(std::move(error_));
   }
 
  private:
@@ -265,7 +266,7 @@ struct ScalarText {
 
 }  // namespace
 
-std::optional<PathTextError> parsePathText(std::string_view text, ObjectPath& path) { return Reader(text).read(path); }
+Expected<ObjectPath, PathTextError> parsePathText(std::string_view text) { return Reader(text).read(); }
 
 std::string pathText(const ObjectPath& path) {
   std::string text;

@@ -1,11 +1,11 @@
 #pragma once
 
 #include <cstddef>
-#include <optional>
 #include <string>
 #include <string_view>
 
 #include "broker/objects/Value.h"
+#include "util/Expected.h"
 
 // Object paths as people type them, the untyped form of DSP0004 8.2 and DSP0207:
 //
@@ -28,9 +28,9 @@ struct PathTextError {
 /// The longest accepted text, in bytes.
 inline constexpr std::size_t kMaxPathText = 65536;
 
-/// Reads a path; a class name without keys is one too. On an error, `path` is left in an unspecified state. Time and
-/// memory depend only on the length of the text.
-std::optional<PathTextError> parsePathText(std::string_view text, ObjectPath& path);
+/// Reads a path; a class name without keys is one too. Time and memory depend only on the length
+/// of the text.
+Expected<ObjectPath, PathTextError> parsePathText(std::string_view text);
 
 /// The path's text; parsePathText reads it back, with references as texts.
 std::string pathText(const ObjectPath& path);

@@ -8,17 +8,15 @@ namespace zorva::broker {
 namespace {
 
 ObjectPath read(std::string_view text) {
-  ObjectPath path;
-  const auto error = parsePathText(text, path);
-  EXPECT_FALSE(error) << text << ": " << (error ? error->message : "");
-  return path;
+  const auto path = parsePathText(text);
+  EXPECT_TRUE(path) << text << ": " << path.error().message;
+  return path.value_or(ObjectPath());
 }
 
 PathTextError failure(std::string_view text) {
-  ObjectPath path;
-  const auto error = parsePathText(text, path);
-  EXPECT_TRUE(error) << text;
-  return error.value_or(PathTextError());
+  const auto path = parsePathText(text);
+  EXPECT_FALSE(path) << text;
+  return path ? PathTextError() : path.error();
 }
 
 TEST(PathText, ReadsClassAndKeys) {

@@ -58,7 +58,7 @@ class ClaimsTest : public ::testing::Test {
 
   Status change() {
     Instance instance;
-    EXPECT_FALSE(parsePathText("T_Thing.Name=\"a\"", instance.path));
+    instance.path = parsePathText("T_Thing.Name=\"a\"").value();
     return broker_->modifyInstance(instance, std::nullopt);
   }
 

@@ -42,7 +42,7 @@ class ModificationTest : public ::testing::Test {
   Status modify(std::vector<Property> properties, const Names& list = std::nullopt,
                 const std::string& name = "T_Thing.Name=\"a\"") {
     Instance instance;
-    EXPECT_FALSE(parsePathText(name, instance.path));
+    instance.path = parsePathText(name).value();
     instance.properties = std::move(properties);
     effect_ = {};
     lines_.clear();
@@ -93,7 +93,7 @@ TEST_F(ModificationTest, AnEmptyListChangesNothing) {
 
 TEST_F(ModificationTest, AWholeInstanceAsItIsChangesNothing) {
   Instance instance;
-  EXPECT_FALSE(parsePathText("T_Thing.Name=\"a\"", instance.path));
+  instance.path = parsePathText("T_Thing.Name=\"a\"").value();
   EXPECT_EQ(broker_->getInstance(instance.path, {}, instance).rc, 0);
   EXPECT_EQ(modify(instance.properties).rc, 0);
   EXPECT_THAT(lines_, Not(Contains(StartsWith("ModifyInstance"))));
