@@ -1,7 +1,6 @@
 #include "agent/Runtime.h"
 
 #include <pthread.h>
-#include <sys/utsname.h>
 #include <syslog.h>
 #include <unistd.h>
 
@@ -12,6 +11,7 @@
 #include "agent/log/LogOutput.h"
 #include "agent/sources/FileSource.h"
 #include "agent/sources/HostSource.h"
+#include "util/HostName.h"
 
 namespace zorva::agent {
 namespace {
@@ -21,11 +21,6 @@ std::shared_ptr<TreeSource> makeSource(const Config& config) {
   HostSourceOptions options;
   options.includeLoopback = config.includeLoopback;
   return std::make_shared<HostSource>(options);
-}
-
-std::string kernelName() {
-  utsname name{};
-  return ::uname(&name) == 0 ? name.nodename : "";
 }
 
 }  // namespace
@@ -178,14 +173,14 @@ std::shared_ptr<const TreeSnapshot> Runtime::latestForCursor() {
 std::string Runtime::systemName() {
   const LoadedConfig& loaded = loadedConfig();
   if (!loaded.config.systemName.empty()) return loaded.config.systemName;
-  if (loaded.error.has_value()) return kernelName();
+  if (loaded.error.has_value()) return util::kernelHostName();
   try {
     // Of the tree that the latest cursor was placed in: a name is told many times in one operation, and must not change
     // on the way.
     const std::shared_ptr<const TreeSnapshot> tree = latestForCursor();
-    return tree == nullptr || tree->systemName().empty() ? kernelName() : tree->systemName();
+    return tree == nullptr || tree->systemName().empty() ? util::kernelHostName() : tree->systemName();
   } catch (...) {
-    return kernelName();
+    return util::kernelHostName();
   }
 }
 

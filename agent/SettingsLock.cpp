@@ -9,12 +9,12 @@
 #include <stdexcept>
 #include <utility>
 
-#include "agent/files/FileError.h"
 #include "agent/files/FileLock.h"
-#include "agent/files/ReadFile.h"
-#include "agent/files/ReplaceFile.h"
 #include "agent/files/Rewrite.h"
 #include "agent/log/LogOutput.h"
+#include "util/FileError.h"
+#include "util/ReadFile.h"
+#include "util/ReplaceFile.h"
 
 namespace zorva::agent {
 namespace {
@@ -34,11 +34,11 @@ mode_t lockRights(const std::string& directory) {
   return 0600 | writers | writers << 1U;
 }
 
-FileDescriptor openForChange(const std::string& directory, const char* name) {
+util::FileDescriptor openForChange(const std::string& directory, const char* name) {
   const mode_t rights = lockRights(directory);
-  FileDescriptor file = openLockFile(directory + name, rights);
+  util::FileDescriptor file = openLockFile(directory + name, rights);
   if (!file && errno == ENOENT) throw std::runtime_error(directory + ": there is no such data directory");
-  if (!file) throwFileError(directory + name, "cannot be opened");
+  if (!file) util::throwFileError(directory + name, "cannot be opened");
   struct stat status {};
   // What the process masks of new files' rights.
   if (::fstat(file.get(), &status) == 0 && (status.st_mode & 0666) != rights && status.st_uid == ::geteuid()) {
@@ -48,10 +48,10 @@ FileDescriptor openForChange(const std::string& directory, const char* name) {
 }
 
 // None where that file cannot be opened, or made.
-FileDescriptor openForRead(const std::string& directory, const char* name) {
-  FileDescriptor file = openLockFile(directory + name, lockRights(directory));
+util::FileDescriptor openForRead(const std::string& directory, const char* name) {
+  util::FileDescriptor file = openLockFile(directory + name, lockRights(directory));
   if (file) return file;
-  return FileDescriptor(::open((directory + name).c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
+  return util::FileDescriptor(::open((directory + name).c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
 }
 
 std::string interfaceFile(const std::string& directory, const std::string& interface) {
@@ -64,8 +64,8 @@ bool canBeAName(const std::string& interface) {
 }
 
 // The lock with the turn taken before it.
-FileLock takeInTurn(FileDescriptor turn, FileDescriptor lock, const std::string& directory, FileLock::Mode mode,
-                    FileLock::Deadline deadline) {
+FileLock takeInTurn(util::FileDescriptor turn, util::FileDescriptor lock, const std::string& directory,
+                    FileLock::Mode mode, FileLock::Deadline deadline) {
   std::optional<FileLock> myTurn;
   if (turn) myTurn.emplace(std::move(turn), directory + kTurnName, mode, deadline);
   return {std::move(lock), directory + kLockName, mode, deadline};
@@ -84,7 +84,7 @@ class SettingsLock::Core {
   }
 
   // Waits for the shared lock.
-  Core(const std::string& directory, FileDescriptor turn, FileDescriptor file, FileLock::Deadline deadline)
+  Core(const std::string& directory, util::FileDescriptor turn, util::FileDescriptor file, FileLock::Deadline deadline)
       : directory_(directory),
         lock_(takeInTurn(std::move(turn), std::move(file), directory, FileLock::Mode::Shared, deadline)) {}
 
@@ -124,7 +124,7 @@ void SettingsLock::Core::writeNameIntoLock(const std::string& name) const {
     const int error = errno;
     (void)!::ftruncate(lock_.descriptor(), 0);
     errno = error;
-    throwFileError(path, "cannot be written");
+    util::throwFileError(path, "cannot be written");
   }
 }
 
@@ -139,13 +139,15 @@ void SettingsLock::Core::keepAside(const std::string& interface) {
   putBackWhatIsLeft();
   if (!canBeAName(interface)) return;  // no file has such a name
   const std::string path = interfaceFile(directory_, interface);
-  FileText file = readFile(path, kLargestFile);
+  util::FileText file = util::readFile(path, kLargestFile);
   if (file.truncated) throw std::runtime_error(path + ": is larger than 16 MiB, and is left as it is");
-  if (mayPass(file.error)) throw std::runtime_error(path + ": cannot be read: " + fileErrorText(file.error));
+  if (util::mayPass(file.error))
+    throw std::runtime_error(path + ": cannot be read: " + util::fileErrorText(file.error));
   if (file.error != 0) return;  // what cannot be read cannot be rewritten
   struct stat rights {};
-  if (::stat(path.c_str(), &rights) != 0) throwFileError(path, "cannot be looked at");
-  replaceFile(directory_, kKeptName, file.text, &rights);
+  if (::stat(path.c_str(), &rights) != 0) util::throwFileError(path, "cannot be looked at");
+  const std::string unsynced = util::replaceFile(directory_, kKeptName, file.text, &rights);
+  if (!unsynced.empty()) ZORVAGENT_LOG_ERROR(unsynced);
   writeNameIntoLock(interface);
   interface_ = interface;
   before_ = std::move(file.text);
@@ -155,7 +157,7 @@ void SettingsLock::Core::keepAside(const std::string& interface) {
 // takes the file's place.
 void SettingsLock::Core::putBack(const std::string& path, const std::string& text) const {
   try {
-    overwriteFile(path, text);
+    util::overwriteFile(path, text);
   } catch (const std::exception&) {
     struct stat status {};
     const bool isLink = ::lstat(path.c_str(), &status) == 0 && S_ISLNK(status.st_mode);
@@ -166,9 +168,9 @@ void SettingsLock::Core::putBack(const std::string& path, const std::string& tex
 std::string SettingsLock::Core::finish() {
   if (interface_.empty()) return {};
   const std::string path = interfaceFile(directory_, interface_);
-  const FileText now = readFile(path, kLargestFile);
-  const bool isCut =
-      now.error == 0 && !now.truncated && (compareRewrite(before_, now.text) == Rewrite::CutShort || !syncFile(path));
+  const util::FileText now = util::readFile(path, kLargestFile);
+  const bool isCut = now.error == 0 && !now.truncated &&
+                     (compareRewrite(before_, now.text) == Rewrite::CutShort || !util::syncFile(path));
   if (!isCut) {
     forget();
     return {};
@@ -188,11 +190,11 @@ void SettingsLock::Core::putBackWhatIsLeft() {
   if (!isSomethingLeft()) return;
   const std::string interface = nameInLock();
   const std::string path = interfaceFile(directory_, interface);
-  const FileText before = readFile(directory_ + kKeptName, kLargestFile);
-  const FileText now = readFile(path, kLargestFile);
+  const util::FileText before = util::readFile(directory_ + kKeptName, kLargestFile);
+  const util::FileText now = util::readFile(path, kLargestFile);
   const bool isCut = canBeAName(interface) && before.error == 0 && now.error == 0 && !now.truncated &&
                      compareRewrite(before.text, now.text) == Rewrite::CutShort;
-  if (mayPass(before.error) || mayPass(now.error)) {
+  if (util::mayPass(before.error) || util::mayPass(now.error)) {
     throw std::runtime_error(path + ": a change of it broke off, and whether it is whole cannot be seen now");
   }
   if (isCut) {
@@ -209,7 +211,7 @@ SettingsLock::SettingsLock(const std::string& directory, Access access) {
     return;
   }
   for (int attempt = 0;; ++attempt) {
-    FileDescriptor lock = openForRead(directory, kLockName);
+    util::FileDescriptor lock = openForRead(directory, kLockName);
     if (!lock) return;
     core_ = std::make_unique<Core>(directory, openForRead(directory, kTurnName), std::move(lock), deadline);
     if (attempt == 1 || !core_->isSomethingLeft()) return;

@@ -12,9 +12,9 @@
 #include <thread>
 #include <vector>
 
-#include "agent/files/FileDescriptor.h"
 #include "agent/files/FileLock.h"
 #include "agent/testing/TemporaryDirectory.h"
+#include "util/FileDescriptor.h"
 
 namespace zorva::agent {
 namespace {
@@ -26,7 +26,7 @@ using testing::TemporaryDirectory;
 constexpr const char* kFile = "HOSTNAME=host1\nDOMAINNAME=example.org\nMTU=1500\n";
 
 bool canLock(const std::string& path, int operation) {
-  const FileDescriptor file(::open(path.c_str(), O_RDWR | O_CLOEXEC));
+  const util::FileDescriptor file(::open(path.c_str(), O_RDWR | O_CLOEXEC));
   return file && ::flock(file.get(), operation | LOCK_NB) == 0;
 }
 

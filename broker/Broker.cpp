@@ -251,7 +251,7 @@ Status checkCall(const ObjectPath& path, const PathObject& name, const schema::C
   for (const schema::Parameter& parameter : method.parameters) {
     if (!isInput(parameter) || !schema::hasQualifier(parameter.qualifiers, "Required")) continue;
     const bool isGiven = std::any_of(input.begin(), input.end(), [&parameter](const NamedValue& argument) {
-      return schema::sameName(argument.name, parameter.name) && !argument.value.isNull;
+      return util::sameName(argument.name, parameter.name) && !argument.value.isNull;
     });
     if (!isGiven) {
       return {CMPI_RC_ERR_INVALID_PARAMETER, method.name + ": the parameter " + parameter.name + " is missing"};
@@ -268,7 +268,7 @@ Status makeArguments(Arena& arena, const schema::ClassMethod& method, const std:
       return {CMPI_RC_ERR_INVALID_PARAMETER, method.name + ": the parameter " + argument.name + " is there twice"};
     }
     for (const schema::Parameter& parameter : method.parameters) {
-      if (!schema::sameName(parameter.name, argument.name)) continue;
+      if (!util::sameName(parameter.name, argument.name)) continue;
       CMPIData data;
       Status status =
           makeData(arena, declaredType(parameter), argument.value, method.name + "." + parameter.name, data);

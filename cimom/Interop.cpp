@@ -12,8 +12,8 @@
 #include "cmpidt.h"
 #include "cmpift.h"
 #include "cmpimacs.h"
-#include "schema/Names.h"
 #include "schema/Schema.h"
+#include "util/Names.h"
 
 namespace zorva::cimom {
 
@@ -58,8 +58,8 @@ InteropWorld worldAt(const CMPIBroker* broker, const CMPIContext* context, const
   world.nameSpaces = broker::BrokerCore::of(broker)->registry().nameSpaces();
   world.profileNameSpace = schema::sameNamespace(world.nameSpace, kEndpointNameSpace) ? kInterop : world.nameSpace;
   world.hostName = hostName();
-  if (schema::sameName(className, kProfileClass)) return world;
-  if (schema::sameName(className, kConformanceClass)) {
+  if (util::sameName(className, kProfileClass)) return world;
+  if (util::sameName(className, kConformanceClass)) {
     world.endpoints = namesOf(broker, context, "CIM_DNSProtocolEndpoint");
   } else {
     world.systems = namesOf(broker, context, "CIM_ComputerSystem");
@@ -158,7 +158,7 @@ CMPIStatus cleanUpAssociations(CMPIAssociationMI* mi, const CMPIContext*, CMPIBo
   return kOk;
 }
 
-bool fits(const std::string& name, const char* role) { return role == nullptr || schema::sameName(name, role); }
+bool fits(const std::string& name, const char* role) { return role == nullptr || util::sameName(name, role); }
 
 /// The associations of `source`: `visit(association, far end)` for each end that is `source`.
 template <class Visit>
@@ -232,7 +232,7 @@ CMPIStatus cleanUpMethods(CMPIMethodMI* mi, const CMPIContext*, CMPIBoolean) {
 /// The central class of the profile is the endpoint.
 CMPIStatus invoke(CMPIMethodMI* mi, const CMPIContext* context, const CMPIResult* result, const CMPIObjectPath* asked,
                   const char* method, const CMPIArgs*, CMPIArgs* output) {
-  if (!schema::sameName(method, "GetCentralInstances")) {
+  if (!util::sameName(method, "GetCentralInstances")) {
     return {CMPI_RC_ERR_METHOD_NOT_AVAILABLE, nullptr};
   }
   const CMPIBroker* broker = brokerOf(mi->hdl);

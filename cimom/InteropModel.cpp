@@ -1,6 +1,6 @@
 #include "cimom/InteropModel.h"
 
-#include "schema/Names.h"
+#include "util/Names.h"
 
 namespace zorva::cimom {
 
@@ -147,7 +147,7 @@ bool sameKey(const Value& a, const Value& b) {
 }  // namespace
 
 std::vector<Instance> interopInstances(const InteropWorld& world, std::string_view className) {
-  const auto is = [className](std::string_view name) { return schema::sameName(className, name); };
+  const auto is = [className](std::string_view name) { return util::sameName(className, name); };
   if (is(kManagerClass)) return {manager(world)};
   if (is("CIM_CIMXMLCommunicationMechanism")) return {communication(world)};
   if (is(kProfileClass)) return {profile(world)};
@@ -161,7 +161,7 @@ std::vector<Instance> interopInstances(const InteropWorld& world, std::string_vi
 }
 
 bool sameInstance(const ObjectPath& a, const ObjectPath& b) {
-  if (!schema::sameName(a.className, b.className) || a.keys.size() != b.keys.size()) return false;
+  if (!util::sameName(a.className, b.className) || a.keys.size() != b.keys.size()) return false;
   for (const broker::NamedValue& key : a.keys) {
     const Value* other = b.key(key.name);
     if (other == nullptr || !sameKey(key.value, *other)) return false;

@@ -5,7 +5,7 @@
 #include "broker/objects/PathText.h"
 #include "cimxml/ElementWriter.h"
 #include "cmpidt.h"
-#include "schema/Utf8.h"
+#include "util/Utf8.h"
 
 namespace zorva::cimom {
 
@@ -27,7 +27,7 @@ constexpr std::pair<std::string_view, const char*> kNotOffered[] = {
 
 Status notOffered(const std::string& name) {
   for (const auto& [known, why] : kNotOffered) {
-    if (schema::sameName(known, name)) return {CMPI_RC_ERR_NOT_SUPPORTED, std::string(known) + ": " + why};
+    if (util::sameName(known, name)) return {CMPI_RC_ERR_NOT_SUPPORTED, std::string(known) + ": " + why};
   }
   return {CMPI_RC_ERR_NOT_SUPPORTED, "there is no operation " + broker::quotedText(name.substr(0, 80))};
 }
@@ -44,8 +44,8 @@ template <class Parameters>
 std::string_view twice(const Parameters& parameters) {
   std::vector<std::string_view> names;
   for (const auto& one : parameters) names.push_back(one.name);
-  std::stable_sort(names.begin(), names.end(), schema::NameLess());
-  const auto found = std::adjacent_find(names.begin(), names.end(), schema::NameEqual());
+  std::stable_sort(names.begin(), names.end(), util::NameLess());
+  const auto found = std::adjacent_find(names.begin(), names.end(), util::NameEqual());
   return found != names.end() ? *found : std::string_view();
 }
 
@@ -83,7 +83,7 @@ void noteChange(const Operation& operation, std::string_view what, const broker:
                 const std::vector<std::string>& names) {
   constexpr std::size_t kLongestPath = 1000;
   const std::string text = broker::pathText(path);
-  std::string line = std::string(what) + " " + text.substr(0, schema::utf8Cut(text, kLongestPath));
+  std::string line = std::string(what) + " " + text.substr(0, util::utf8Cut(text, kLongestPath));
   for (const std::string& name : names) line += (&name == names.data() ? ": " : ", ") + name;
   operation.noteChange(line);
 }
@@ -107,7 +107,7 @@ bool isNameOfASystem(const Operation& operation, std::string_view host) {
   bool found = false;
   const broker::PathSink look = [&](const broker::ObjectPath& path) {
     const broker::Value* name = path.key("Name");
-    found = found || (name != nullptr && schema::sameName(name->asText(), host));
+    found = found || (name != nullptr && util::sameName(name->asText(), host));
     return !found;
   };
   operation.broker.enumerateInstanceNames({}, "CIM_ComputerSystem", look, operation.caller);
@@ -116,7 +116,7 @@ bool isNameOfASystem(const Operation& operation, std::string_view host) {
 
 /// Whether a name has all the given keys.
 bool hasKeys(const broker::ObjectPath& name, const broker::ObjectPath& given) {
-  return schema::sameName(name.className, given.className) &&
+  return util::sameName(name.className, given.className) &&
          std::all_of(given.keys.begin(), given.keys.end(), [&name](const broker::NamedValue& key) {
            const broker::Value* value = name.key(key.name);
            return value != nullptr && *value == key.value;
@@ -178,7 +178,7 @@ Status checkSaidTypes(const Operation& operation) {
   for (std::size_t i = 0; i < call.input.size(); ++i) {
     for (const schema::Parameter& parameter : method->parameters) {
       if (!call.saidTypes[i] || *call.saidTypes[i] == parameter.type) continue;
-      if (!schema::sameName(parameter.name, call.input[i].name)) continue;
+      if (!util::sameName(parameter.name, call.input[i].name)) continue;
       return {CMPI_RC_ERR_INVALID_PARAMETER, method->name + ": the parameter " + parameter.name + " is a " +
                                                  std::string(schema::typeName(parameter.type)) + ", but comes as a " +
                                                  std::string(schema::typeName(*call.saidTypes[i]))};

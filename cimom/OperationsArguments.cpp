@@ -3,7 +3,7 @@
 #include <charconv>
 
 #include "cmpidt.h"
-#include "schema/Names.h"
+#include "util/Names.h"
 
 namespace zorva::cimom {
 
@@ -17,7 +17,7 @@ bool isNone(const cimxml::ParameterValue* value) noexcept { return std::holds_al
 
 const cimxml::ParameterValue* Arguments::take(std::string_view name) {
   for (std::size_t i = 0; i < call_.parameters.size(); ++i) {
-    if (!schema::sameName(call_.parameters[i].name, name)) continue;
+    if (!util::sameName(call_.parameters[i].name, name)) continue;
     taken_[i] = true;
     return &call_.parameters[i].value;
   }
@@ -32,8 +32,8 @@ bool Arguments::boolean(std::string_view name, bool otherwise) {
   const cimxml::ParameterValue* value = take(name);
   if (isNone(value)) return otherwise;
   const auto* text = std::get_if<std::string>(value);
-  if (text != nullptr && schema::sameName(*text, "true")) return true;
-  if (text != nullptr && schema::sameName(*text, "false")) return false;
+  if (text != nullptr && util::sameName(*text, "true")) return true;
+  if (text != nullptr && util::sameName(*text, "false")) return false;
   refuse(name, "must be TRUE or FALSE");
   return otherwise;
 }

@@ -17,7 +17,7 @@ namespace {
 using broker::Status;
 using schema::Class;
 using schema::ClassProperty;
-using schema::sameName;
+using util::sameName;
 
 /// The parameters of all four operations: which objects, and which part of them.
 struct Question {

@@ -114,7 +114,7 @@ OperationFunction findClassOperation(std::string_view name) noexcept {
       {"EnumerateQualifiers", enumerateQualifiers},
   };
   for (const auto& [known, function] : kOperations) {
-    if (schema::sameName(known, name)) return function;
+    if (util::sameName(known, name)) return function;
   }
   return nullptr;
 }

@@ -188,7 +188,7 @@ OperationFunction findInstanceOperation(std::string_view name) noexcept {
       {"SetProperty", setProperty},
   };
   for (const auto& [known, function] : kOperations) {
-    if (schema::sameName(known, name)) return function;
+    if (util::sameName(known, name)) return function;
   }
   return nullptr;
 }

@@ -234,7 +234,7 @@ OperationFunction findPullOperation(std::string_view name) noexcept {
       {"EnumerationCount", enumerationCount},
   };
   for (const auto& [known, function] : kOperations) {
-    if (schema::sameName(known, name)) return function;
+    if (util::sameName(known, name)) return function;
   }
   return nullptr;
 }

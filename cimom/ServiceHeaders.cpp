@@ -4,22 +4,17 @@
 
 #include "broker/objects/PathText.h"
 #include "cimxml/HeaderFields.h"
-#include "schema/Names.h"
 #include "schema/Schema.h"
+#include "util/Names.h"
+#include "util/Text.h"
 
 namespace zorva::cimom {
 
 namespace {
 
-using schema::sameName;
+using util::sameName;
 
 constexpr std::string_view kMapping = "http://www.dmtf.org/cim/mapping/http/v1.0";
-
-std::string_view trimmed(std::string_view text) noexcept {
-  const std::size_t begin = text.find_first_not_of(" \t");
-  if (begin == std::string_view::npos) return {};
-  return text.substr(begin, text.find_last_not_of(" \t") - begin + 1);
-}
 
 const std::string* find(const http::HttpRequest& request, std::string_view name) noexcept {
   for (const auto& [known, value] : request.headers) {
@@ -30,7 +25,7 @@ const std::string* find(const http::HttpRequest& request, std::string_view name)
 
 std::string textOf(const http::HttpRequest& request, std::string_view name) {
   const std::string* value = find(request, name);
-  return value != nullptr ? std::string(trimmed(*value)) : std::string();
+  return value != nullptr ? std::string(util::trimmed(*value)) : std::string();
 }
 
 auto refusal(int status, std::string cimError, std::string message) {
@@ -47,10 +42,10 @@ std::optional<std::string> declaredPrefix(const http::HttpRequest& request) {
   std::string_view rest = std::string_view(man).substr(mapping + kMapping.size());
   if (rest.starts_with('"')) rest.remove_prefix(1);
   const std::size_t equals = rest.find("ns");
-  if (trimmed(rest.substr(0, equals)) != ";") return std::nullopt;
-  rest = trimmed(rest.substr(equals + 2));
+  if (util::trimmed(rest.substr(0, equals)) != ";") return std::nullopt;
+  rest = util::trimmed(rest.substr(equals + 2));
   if (!rest.starts_with('=')) return std::nullopt;
-  rest = trimmed(rest.substr(1));
+  rest = util::trimmed(rest.substr(1));
   const std::string_view digits = rest.substr(0, rest.find_first_not_of("0123456789"));
   if (digits.empty() || digits.size() > 8) return std::nullopt;
   return std::string(digits);
@@ -64,7 +59,7 @@ Expected<std::optional<std::string>, HttpRefusal> take(const http::HttpRequest& 
   for (const auto& [known, text] : request.headers) {
     if (!sameName(known, name) && (prefixed.empty() || !sameName(known, prefixed))) continue;
     if (value) return mismatch("the header " + std::string(name) + " is given twice");
-    value = cimxml::strictFieldText(trimmed(text));
+    value = cimxml::strictFieldText(util::trimmed(text));
     if (!value) return mismatch("the header " + std::string(name) + " is not UTF-8 in percent-encoding");
   }
   return value;

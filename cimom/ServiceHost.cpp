@@ -2,24 +2,23 @@
 
 #include <arpa/inet.h>
 #include <ifaddrs.h>
-#include <limits.h>
 #include <netinet/in.h>
-#include <unistd.h>
 
 #include <cstring>
 #include <memory>
 #include <optional>
 #include <vector>
 
-#include "schema/Names.h"
+#include "util/HostName.h"
+#include "util/Names.h"
 
 namespace zorva::cimom {
 
 namespace {
 
 std::string kernelName() {
-  char name[HOST_NAME_MAX + 1] = {};
-  return gethostname(name, sizeof name - 1) == 0 && name[0] != '\0' ? name : "localhost";
+  const std::string name = util::kernelHostName();
+  return name.empty() ? "localhost" : name;
 }
 
 /// "h" of "h", "h:5988", "[::1]:5988" and "::1".
@@ -70,10 +69,10 @@ std::string_view firstLabel(std::string_view name) noexcept { return name.substr
 
 /// True if the names are equal, or one is the other with a domain.
 bool sameHost(std::string_view a, std::string_view b) noexcept {
-  if (schema::sameName(a, b)) return true;
+  if (util::sameName(a, b)) return true;
   const bool aIsShort = a.find('.') == std::string_view::npos;
   const bool bIsShort = b.find('.') == std::string_view::npos;
-  return aIsShort != bIsShort && schema::sameName(firstLabel(a), firstLabel(b));
+  return aIsShort != bIsShort && util::sameName(firstLabel(a), firstLabel(b));
 }
 
 }  // namespace
@@ -85,8 +84,8 @@ bool ServiceHost::isThis(std::string_view text, std::string_view hostHeader) con
   if (host.ends_with('.')) host.remove_suffix(1);
   if (host.empty()) return false;
   if (const std::string address = addressOf(host); !address.empty()) return isOwnAddress(address);
-  return schema::sameName(host, "localhost") || schema::sameName(firstLabel(host), "localhost") ||
-         schema::sameName(host, withoutPort(hostHeader)) || sameHost(host, name_) || sameHost(host, kernelName());
+  return util::sameName(host, "localhost") || util::sameName(firstLabel(host), "localhost") ||
+         util::sameName(host, withoutPort(hostHeader)) || sameHost(host, name_) || sameHost(host, kernelName());
 }
 
 }  // namespace zorva::cimom

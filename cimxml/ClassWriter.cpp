@@ -82,7 +82,7 @@ void appendMethod(std::string& out, const schema::ClassMethod& method, const sch
 bool isListed(const ClassDetail& detail, std::string_view name) {
   return !detail.propertyList ||
          std::any_of(detail.propertyList->begin(), detail.propertyList->end(),
-                     [name](const std::string& listed) { return schema::sameName(listed, name); });
+                     [name](const std::string& listed) { return util::sameName(listed, name); });
 }
 
 }  // namespace

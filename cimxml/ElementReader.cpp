@@ -5,7 +5,7 @@
 #include <limits>
 #include <optional>
 
-#include "schema/Utf8.h"
+#include "util/Utf8.h"
 
 namespace zorva::cimxml {
 
@@ -72,10 +72,10 @@ broker::Scalar responseScalar(xml_node place, std::string text, schema::Type typ
   if (schema::isUnsigned(type)) return wholeNumber<std::uint64_t>(place, text);
   if (schema::isSigned(type)) return wholeNumber<std::int64_t>(place, text);
   if (schema::isReal(type)) return realNumber(place, text);
-  if (type == schema::Type::Boolean) return schema::sameName(trimmed(text), "TRUE");
+  if (type == schema::Type::Boolean) return util::sameName(trimmed(text), "TRUE");
   if (type == schema::Type::Char16) {
-    const std::size_t length = schema::utf8Length(text);
-    return static_cast<char16_t>(length == 0 || length > 3 ? 0xFFFD : schema::utf8Decode(text));
+    const std::size_t length = util::utf8Length(text);
+    return static_cast<char16_t>(length == 0 || length > 3 ? 0xFFFD : util::utf8Decode(text));
   }
   return text;
 }
@@ -124,7 +124,7 @@ schema::Type ElementReader::typeOf(xml_node node, const char* attribute) const {
   const pugi::xml_attribute said = node.attribute(attribute);
   const std::string_view text = said.value();
   if (!said || (text.empty() && !isRequest())) return schema::Type::String;
-  if (schema::sameName(text, "reference")) return schema::Type::Reference;
+  if (util::sameName(text, "reference")) return schema::Type::Reference;
   if (text == "object" || text == "instance") return schema::Type::String;
   if (const auto type = schema::typeFromName(text)) return *type;
   refuse(node, (isRequest() ? quoted(text) : "'" + std::string(text) + "'") + " is no CIM type");
@@ -302,8 +302,8 @@ broker::Scalar ElementReader::requestScalar(xml_node place, std::string text, co
     case schema::Type::String:
       return text;
     case schema::Type::Char16: {
-      const std::size_t length = schema::utf8Length(text);
-      const std::uint32_t code = length == 0 ? 0 : schema::utf8Decode(text);
+      const std::size_t length = util::utf8Length(text);
+      const std::uint32_t code = length == 0 ? 0 : util::utf8Decode(text);
       if (length == 0 || length != text.size() || code > 0xFFFF) refuse(place, quoted(text) + " is no char16");
       return static_cast<char16_t>(code);
     }

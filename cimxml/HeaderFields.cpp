@@ -2,7 +2,7 @@
 
 #include <charconv>
 
-#include "schema/Utf8.h"
+#include "util/Utf8.h"
 
 namespace zorva::cimxml {
 
@@ -20,15 +20,6 @@ std::optional<char> escapedByte(std::string_view text) noexcept {
   const char* const digits = text.data() + 1;
   if (std::from_chars(digits, digits + 2, byte, 16).ptr != digits + 2) return std::nullopt;
   return static_cast<char>(byte);
-}
-
-bool isUtf8(std::string_view text) noexcept {
-  while (!text.empty()) {
-    const std::size_t length = schema::utf8Length(text);
-    if (length == 0) return false;
-    text.remove_prefix(length);
-  }
-  return true;
 }
 
 struct Decoded {
@@ -68,7 +59,7 @@ std::string fieldText(std::string_view value) { return decode(value).text; }
 
 std::optional<std::string> strictFieldText(std::string_view value) {
   Decoded decoded = decode(value);
-  if (!decoded.isWhole || !isUtf8(decoded.text)) return std::nullopt;
+  if (!decoded.isWhole || !util::isUtf8(decoded.text)) return std::nullopt;
   return std::move(decoded.text);
 }
 

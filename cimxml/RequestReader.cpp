@@ -2,7 +2,7 @@
 
 #include "cimxml/ElementReader.h"
 #include "cimxml/XmlTree.h"
-#include "schema/Names.h"
+#include "util/Names.h"
 
 namespace zorva::cimxml {
 
@@ -37,7 +37,7 @@ ParameterValue readParameterValue(xml_node node, ElementReader& reader) {
   broker::Instance instance = reader.instance(required(value, {"INSTANCE"}));
   const std::string madeOf = instance.path.className;
   reader.instanceName(required(value, {"INSTANCENAME"}), instance.path);
-  if (!schema::sameName(madeOf, instance.path.className)) {
+  if (!util::sameName(madeOf, instance.path.className)) {
     refuse(value, "INSTANCENAME and INSTANCE are of the classes " + quoted(instance.path.className) + " and " +
                       quoted(madeOf));
   }

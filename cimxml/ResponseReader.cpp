@@ -125,7 +125,7 @@ class Reader {
       schema::Qualifier qualifier;
       qualifier.name = textAttribute(each, "NAME");
       if (qualifier.name == "Key" || qualifier.name == "Association") {
-        qualifier.value = schema::Value::of(schema::sameName(trimmed(elements_.content(each.child("VALUE"))), "TRUE"));
+        qualifier.value = schema::Value::of(util::sameName(trimmed(elements_.content(each.child("VALUE"))), "TRUE"));
       } else if (qualifier.name == "ValueMap" || qualifier.name == "Values") {
         std::vector<schema::Scalar> texts;
         for (const xml_node& value : each.child("VALUE.ARRAY")) texts.emplace_back(elements_.content(value));

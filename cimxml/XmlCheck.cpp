@@ -3,8 +3,8 @@
 #include <algorithm>
 #include <charconv>
 
-#include "schema/Names.h"
-#include "schema/Utf8.h"
+#include "util/Names.h"
+#include "util/Utf8.h"
 
 namespace zorva::cimxml {
 
@@ -60,9 +60,9 @@ class Checker {
         ++i;
         continue;
       }
-      const std::size_t length = schema::utf8Length(text_.substr(i));
+      const std::size_t length = util::utf8Length(text_.substr(i));
       if (length == 0) return fail(i, "this is no UTF-8");
-      if (!isXmlCharacter(schema::utf8Decode(text_.substr(i)))) return fail(i, "XML 1.0 has no such character");
+      if (!isXmlCharacter(util::utf8Decode(text_.substr(i)))) return fail(i, "XML 1.0 has no such character");
       i += length;
     }
     return true;
@@ -115,7 +115,7 @@ class Checker {
     const std::size_t close = open == std::string_view::npos ? open : piece.find(piece[open], open + 1);
     if (close == std::string_view::npos) return fail(begin, "the XML declaration is malformed");
     const std::string_view encoding = piece.substr(open + 1, close - open - 1);
-    if (schema::sameName(encoding, "utf-8") || schema::sameName(encoding, "us-ascii")) return true;
+    if (util::sameName(encoding, "utf-8") || util::sameName(encoding, "us-ascii")) return true;
     return fail(begin, "the encoding is not UTF-8 but " + std::string(encoding.substr(0, 40)));
   }
 

@@ -7,7 +7,7 @@
 #include <cstdint>
 #include <cstring>
 
-#include "schema/Utf8.h"
+#include "util/Utf8.h"
 
 namespace zorva::cimxml {
 
@@ -100,8 +100,8 @@ void appendEscaped(std::string& out, std::string_view text) {
       continue;
     }
     const std::string_view rest = text.substr(i);
-    const std::size_t length = byte < 0x80 ? 1 : schema::utf8Length(rest);
-    if (byte >= 0x80 && length > 0 && isXmlCharacter(schema::utf8Decode(rest))) {
+    const std::size_t length = byte < 0x80 ? 1 : util::utf8Length(rest);
+    if (byte >= 0x80 && length > 0 && isXmlCharacter(util::utf8Decode(rest))) {
       i += length;
       continue;
     }
@@ -134,7 +134,7 @@ void PlainContent::operator()(char16_t value) const {
     return;
   }
   std::string text;
-  schema::utf8Append(text, value);
+  util::utf8Append(text, value);
   appendEscaped(out, text);
 }
 

@@ -3,7 +3,8 @@
 #include <algorithm>
 #include <cstring>
 
-#include "schema/Utf8.h"
+#include "util/Text.h"
+#include "util/Utf8.h"
 
 namespace zorva::cimxml {
 
@@ -76,9 +77,7 @@ bool isOneOf(xml_node node, std::initializer_list<const char*> names) noexcept {
   return std::any_of(names.begin(), names.end(), [node](const char* name) { return is(node, name); });
 }
 
-std::string quoted(std::string_view text) {
-  return "\"" + std::string(text.substr(0, schema::utf8Cut(text, 80))) + "\"";
-}
+std::string quoted(std::string_view text) { return "\"" + std::string(text.substr(0, util::utf8Cut(text, 80))) + "\""; }
 
 std::string elementName(xml_node node) { return node ? node.name() : "nothing"; }
 
@@ -97,12 +96,7 @@ xml_node required(xml_node node, std::initializer_list<const char*> names) {
   refuse(node, std::string(node.name()) + " has no " + wanted);
 }
 
-std::string_view trimmed(std::string_view text) noexcept {
-  constexpr std::string_view kBlanks = " \t\r\n";
-  const std::size_t begin = text.find_first_not_of(kBlanks);
-  if (begin == std::string_view::npos) return {};
-  return text.substr(begin, text.find_last_not_of(kBlanks) - begin + 1);
-}
+std::string_view trimmed(std::string_view text) noexcept { return util::trimmed(text, util::kWhiteSpace); }
 
 void Count::add(xml_node node, xml_node outer) {
   if (++count_ <= most_) return;

@@ -8,7 +8,7 @@
 #include <string_view>
 
 #include "cimxml/ReaderLimits.h"
-#include "schema/Names.h"
+#include "util/Names.h"
 
 // A text as a tree of XML elements, the steps of a reader in it, and how a reader refuses what it finds. For the
 // readers of this folder alone.
@@ -91,7 +91,7 @@ class UniqueNames {
 
  private:
   // An order, not a hash: whoever knows the hash could choose names that collide.
-  std::set<std::string_view, schema::NameLess> names_;
+  std::set<std::string_view, util::NameLess> names_;
 };
 
 }  // namespace zorva::cimxml

@@ -6,8 +6,8 @@
 #include "cli/Failure.h"
 #include "cli/Paths.h"
 #include "cli/Text.h"
-#include "schema/Names.h"
-#include "schema/Utf8.h"
+#include "util/Names.h"
+#include "util/Utf8.h"
 
 namespace zorva::cli {
 
@@ -18,7 +18,7 @@ constexpr std::size_t kShownText = 60;
 /// The text for an error, not longer than a line.
 std::string quoted(std::string_view text) {
   const bool isLong = text.size() > kShownText;
-  return "'" + printable(text.substr(0, isLong ? schema::utf8Cut(text, kShownText) : text.size())) +
+  return "'" + printable(text.substr(0, isLong ? util::utf8Cut(text, kShownText) : text.size())) +
          (isLong ? "...'" : "'");
 }
 
@@ -57,15 +57,15 @@ broker::Scalar parseReal(const TypedName& declared, std::string_view text) {
 
 broker::Scalar parseBoolean(const TypedName& declared, std::string_view text) {
   for (const bool value : {true, false}) {
-    if (schema::sameName(text, value ? "true" : "false")) return value;
+    if (util::sameName(text, value ? "true" : "false")) return value;
   }
   throw wrongValue(declared, text, "true or false is wanted");
 }
 
 broker::Scalar parseCharacter(const TypedName& declared, std::string_view text) {
-  const std::size_t length = schema::utf8Length(text);
+  const std::size_t length = util::utf8Length(text);
   if (length == 0 || length != text.size() || length > 3) throw wrongValue(declared, text, "one character is wanted");
-  return static_cast<char16_t>(schema::utf8Decode(text));
+  return static_cast<char16_t>(util::utf8Decode(text));
 }
 
 /// Tests that the value is within what its type can hold.
@@ -94,8 +94,8 @@ broker::Scalar parseScalar(const TypedName& declared, const std::string& text) {
 
 void requirePlainText(std::string_view what, std::string_view text) {
   for (std::size_t at = 0; at < text.size();) {
-    const std::size_t length = schema::utf8Length(text.substr(at));
-    const std::uint32_t code = length == 0 ? 0 : schema::utf8Decode(text.substr(at));
+    const std::size_t length = util::utf8Length(text.substr(at));
+    const std::uint32_t code = length == 0 ? 0 : util::utf8Decode(text.substr(at));
     if (length == 0 || code < 0x20 || (code >= 0x7F && code < 0xA0)) {
       throw Failure(ExitCode::WrongUsage, printable(what) + "=" + quoted(text) + ": byte " + std::to_string(at + 1) +
                                               (length == 0 ? " is no UTF-8" : " is a control character"));
@@ -133,7 +133,7 @@ std::vector<Assignment> parseAssignments(const std::vector<std::string>& words) 
     }
     const std::string name = word.substr(0, equals);
     auto same = std::find_if(assignments.begin(), assignments.end(),
-                             [&name](const Assignment& other) { return schema::sameName(other.name, name); });
+                             [&name](const Assignment& other) { return util::sameName(other.name, name); });
     if (same == assignments.end()) same = assignments.insert(assignments.end(), {name, {}});
     same->texts.push_back(word.substr(equals + 1));
   }

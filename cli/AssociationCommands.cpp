@@ -23,7 +23,7 @@ void requireRole(const char* option, const std::string& role, const std::vector<
   std::vector<std::string> names;
   for (const schema::Class* association : associations) {
     for (const schema::ClassProperty* each : association->references()) {
-      if (role.empty() || schema::sameName(each->name, role)) return;
+      if (role.empty() || util::sameName(each->name, role)) return;
       if (std::find(names.begin(), names.end(), each->name) == names.end()) names.push_back(each->name);
     }
   }

@@ -11,7 +11,7 @@
 #include "cmpidt.h"
 #include "frontend/ReadBack.h"
 #include "frontend/SettingPlace.h"
-#include "schema/Names.h"
+#include "util/Names.h"
 
 namespace zorva::cli {
 
@@ -38,7 +38,7 @@ broker::Instance instanceToSend(const broker::Instance& found, const std::vector
   const bool storesAll = found.path.className == kEndpointClass;
   for (const broker::Property& property : found.properties) {
     const bool isChanged = std::any_of(changes.begin(), changes.end(), [&](const broker::Property& change) {
-      return schema::sameName(change.name, property.name);
+      return util::sameName(change.name, property.name);
     });
     if (only || isChanged || property.value.isNull || (storesAll && isEmpty(property.value))) continue;
     sent.properties.push_back(property);

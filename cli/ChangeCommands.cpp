@@ -47,7 +47,7 @@ const schema::ClassMethod& methodNamed(const schema::Class& declared, const std:
 
 broker::NamedValue parseParameter(const schema::ClassMethod& method, const Assignment& assignment) {
   for (const schema::Parameter& parameter : method.parameters) {
-    if (!schema::sameName(parameter.name, assignment.name)) continue;
+    if (!util::sameName(parameter.name, assignment.name)) continue;
     return {parameter.name, parseValue({parameter.name, parameter.type, parameter.isArray}, assignment.texts)};
   }
   std::vector<std::string> names;

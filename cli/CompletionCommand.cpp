@@ -88,7 +88,7 @@ void addInterfaces(const Arguments& arguments, std::vector<std::string>& words) 
 }
 
 bool begins(const std::string& word, const std::string& begun) {
-  return word.size() >= begun.size() && schema::sameName(std::string_view(word).substr(0, begun.size()), begun);
+  return word.size() >= begun.size() && util::sameName(std::string_view(word).substr(0, begun.size()), begun);
 }
 
 Completion completionOf(const Arguments& arguments, const std::vector<std::string>& before) {

@@ -10,7 +10,7 @@
 #include "cli/HostView.h"
 #include "cli/Text.h"
 #include "cli/ValueText.h"
-#include "schema/Names.h"
+#include "util/Names.h"
 
 namespace zorva::cli {
 
@@ -21,9 +21,8 @@ std::string identity(const broker::ObjectPath& path) {
   broker::ObjectPath plain = path;
   plain.host.clear();
   plain.nameSpace.clear();
-  std::sort(plain.keys.begin(), plain.keys.end(), [](const broker::NamedValue& a, const broker::NamedValue& b) {
-    return schema::NameLess()(a.name, b.name);
-  });
+  std::sort(plain.keys.begin(), plain.keys.end(),
+            [](const broker::NamedValue& a, const broker::NamedValue& b) { return util::NameLess()(a.name, b.name); });
   return shortPathText(plain);
 }
 
@@ -117,7 +116,7 @@ class Walk {
 
   void add(const broker::Instance& association) {
     // A server says by it which profile an object conforms to. That is no part of the configuration.
-    if (schema::sameName(association.path.className, "CIM_ElementConformsToProfile")) return;
+    if (util::sameName(association.path.className, "CIM_ElementConformsToProfile")) return;
     std::vector<GraphEnd> ends;
     for (const broker::Property& property : association.properties) {
       const auto* path = std::get_if<broker::Boxed<broker::ObjectPath>>(&property.value.scalar);

@@ -15,6 +15,7 @@
 #include "cli/Paths.h"
 #include "cli/ResultWriter.h"
 #include "cli/Session.h"
+#include "util/FileDescriptor.h"
 
 extern char** environ;
 
@@ -51,18 +52,13 @@ void writeSvg(const std::string& dot) {
   if (::pipe2(ends, O_CLOEXEC) != 0) {
     throw Failure(ExitCode::Failed, std::string("cannot make a pipe: ") + std::strerror(errno));
   }
+  util::FileDescriptor output(ends[0]);
+  util::FileDescriptor input(ends[1]);
   std::signal(SIGPIPE, SIG_IGN);
-  pid_t child = -1;
-  try {
-    child = startDot(ends[0]);
-  } catch (...) {
-    ::close(ends[0]);
-    ::close(ends[1]);
-    throw;
-  }
-  ::close(ends[0]);
-  feed(ends[1], dot);
-  ::close(ends[1]);
+  const pid_t child = startDot(output.get());
+  output.reset();
+  feed(input.get(), dot);
+  input.reset();
   int status = 0;
   while (::waitpid(child, &status, 0) < 0 && errno == EINTR) {
   }

@@ -7,7 +7,8 @@
 
 #include "cli/Failure.h"
 #include "cli/Text.h"
-#include "schema/Names.h"
+#include "util/Names.h"
+#include "util/Text.h"
 
 namespace zorva::cli {
 
@@ -16,12 +17,6 @@ namespace {
 constexpr long kConnectSeconds = 10;
 constexpr long kSilentSeconds = 120;
 constexpr std::size_t kLargestReply = std::size_t{256} << 20U;
-
-std::string_view trimmed(std::string_view text) noexcept {
-  const std::size_t from = text.find_first_not_of(" \t\r\n");
-  if (from == std::string_view::npos) return {};
-  return text.substr(from, text.find_last_not_of(" \t\r\n") - from + 1);
-}
 
 std::size_t takeBody(char* data, std::size_t size, std::size_t count, void* reply) {
   std::string& body = static_cast<HttpReply*>(reply)->body;
@@ -37,7 +32,8 @@ std::size_t takeField(char* data, std::size_t size, std::size_t count, void* rep
   if (line.starts_with("HTTP/")) fields.clear();
   const std::size_t colon = line.find(':');
   if (colon == std::string_view::npos || fields.size() >= 1000) return size * count;
-  fields.emplace_back(trimmed(line.substr(0, colon)), trimmed(line.substr(colon + 1)));
+  fields.emplace_back(util::trimmed(line.substr(0, colon), util::kWhiteSpace),
+                      util::trimmed(line.substr(colon + 1), util::kWhiteSpace));
   return size * count;
 }
 
@@ -153,7 +149,7 @@ HttpReply HttpClient::post(const std::vector<std::string>& fields, const std::st
 
 std::string_view HttpReply::field(std::string_view name) const noexcept {
   for (auto each = fields.rbegin(); each != fields.rend(); ++each) {
-    if (schema::sameName(each->first, name)) return each->second;
+    if (util::sameName(each->first, name)) return each->second;
   }
   return {};
 }

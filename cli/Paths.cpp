@@ -5,7 +5,7 @@
 #include "broker/objects/PathText.h"
 #include "cli/Failure.h"
 #include "cli/Text.h"
-#include "schema/Names.h"
+#include "util/Names.h"
 
 namespace zorva::cli {
 
@@ -39,7 +39,7 @@ bool valuesMatch(const broker::Value& given, const broker::Value& found) {
   if (!isReference(given) || !isReference(found)) return given == found;
   const broker::ObjectPath& wanted = *std::get<broker::Boxed<broker::ObjectPath>>(given.scalar);
   const broker::ObjectPath& there = *std::get<broker::Boxed<broker::ObjectPath>>(found.scalar);
-  return schema::sameName(wanted.className, there.className) && keysMatch(wanted, there);
+  return util::sameName(wanted.className, there.className) && keysMatch(wanted, there);
 }
 
 std::string listed(const std::vector<broker::ObjectPath>& paths) {
@@ -87,7 +87,7 @@ void requireClassesOfReferences(Session& session, const broker::ObjectPath& give
 bool isServed(Session& session, const broker::ObjectPath& path) {
   const std::vector<broker::ProviderEntry>& served = session.cim().served();
   return std::any_of(served.begin(), served.end(), [&path](const broker::ProviderEntry& entry) {
-    return schema::sameName(entry.className, path.className);
+    return util::sameName(entry.className, path.className);
   });
 }
 

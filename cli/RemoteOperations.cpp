@@ -67,7 +67,7 @@ std::unique_ptr<schema::ClassRepository> repositoryOf(schema::ClassDeclaration d
   }
   declared.superclass.clear();
   const auto addReferred = [&](const std::string& name) {
-    if (name.empty() || schema::sameName(name, declared.name) || repository->find(name) != nullptr) return;
+    if (name.empty() || util::sameName(name, declared.name) || repository->find(name) != nullptr) return;
     schema::ClassDeclaration referred;
     referred.name = name;
     repository->add(std::move(referred));

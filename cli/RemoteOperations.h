@@ -8,7 +8,7 @@
 #include "cli/HttpClient.h"
 #include "cli/Operations.h"
 #include "cli/ServerUrl.h"
-#include "schema/Names.h"
+#include "util/Names.h"
 
 // The CIM operations asked of a server: CIM-XML over HTTP (DSP0200 1.4).
 
@@ -57,7 +57,7 @@ class RemoteOperations : public Operations {
   broker::ProviderRegistry served_;
   HttpClient http_;
   /// Classes that were asked for, each with a repository of its own; null: the server has none of that name.
-  std::map<std::string, std::unique_ptr<schema::ClassRepository>, schema::NameLess> fetched_;
+  std::map<std::string, std::unique_ptr<schema::ClassRepository>, util::NameLess> fetched_;
 };
 
 }  // namespace zorva::cli

@@ -5,7 +5,7 @@
 
 #include "cli/Failure.h"
 #include "cli/Text.h"
-#include "schema/Names.h"
+#include "util/Names.h"
 
 namespace zorva::cli {
 
@@ -52,7 +52,7 @@ ServerUrl readServerUrl(std::string_view text) {
   ServerUrl url;
   const std::size_t colon = text.find("://");
   url.scheme = std::string(text.substr(0, colon));
-  std::transform(url.scheme.begin(), url.scheme.end(), url.scheme.begin(), schema::lowerAscii);
+  std::transform(url.scheme.begin(), url.scheme.end(), url.scheme.begin(), util::lowerAscii);
   if (colon == std::string_view::npos || (url.scheme != "http" && url.scheme != "https")) {
     throw wrongUrl("it begins neither with http:// nor with https://");
   }

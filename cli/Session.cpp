@@ -14,8 +14,9 @@
 #include "cli/Progress.h"
 #include "cli/RemoteOperations.h"
 #include "cli/Text.h"
-#include "schema/Names.h"
 #include "schema/Schema.h"
+#include "util/LogLevels.h"
+#include "util/Names.h"
 
 namespace zorva::cli {
 
@@ -24,11 +25,11 @@ namespace {
 std::string similarNames(const schema::ClassRepository& classes, std::string_view name) {
   std::vector<std::string> similar;
   std::string wanted(name);
-  std::transform(wanted.begin(), wanted.end(), wanted.begin(), schema::lowerAscii);
+  std::transform(wanted.begin(), wanted.end(), wanted.begin(), util::lowerAscii);
   if (const std::size_t underscore = wanted.find('_'); underscore != std::string::npos) wanted.erase(0, underscore + 1);
   for (const schema::Class* each : classes.classes()) {
     std::string known = each->name();
-    std::transform(known.begin(), known.end(), known.begin(), schema::lowerAscii);
+    std::transform(known.begin(), known.end(), known.begin(), util::lowerAscii);
     const bool fits = wanted.size() >= 3 && known.find(wanted) != std::string::npos;
     if (fits && known.starts_with("zorva_") && similar.size() < 5) similar.push_back(each->name());
   }
@@ -48,7 +49,7 @@ class QuietLog : public zorva::agent::LogSink {
  public:
   void record(const zorva::agent::LogCall& /*call*/) override {}
   void recordOwn(int level, const std::string& message) override {
-    if (level >= 5000) tellWarning(printable(message));
+    if (level >= util::kLevelWarning) tellWarning(printable(message));
   }
 };
 
@@ -88,7 +89,7 @@ class Finally {
 Session::Session(const Arguments& arguments)
     : layout_(Layout::ofStandardOutput()),
       url_(arguments.url),
-      logLevel_(arguments.logLevel.value_or(6000)),
+      logLevel_(arguments.logLevel.value_or(util::kLevelError)),
       wantsLog_(arguments.logLevel.has_value()),
       providerDirectory_(arguments.providerDirectory) {
   if (isRemote()) return;
@@ -171,10 +172,7 @@ Session::Quiet::~Quiet() {
 }
 
 void Session::log(broker::LogLevel level, std::string_view text) const {
-  // The broker's levels on the agent's scale of numbers.
-  constexpr int kLevels[] = {3000, 4000, 5000, 6000};
-  const int number = kLevels[static_cast<std::size_t>(level)];
-  if (isQuiet() || number < std::min(logLevel_, 5000)) return;
+  if (isQuiet() || static_cast<int>(level) < std::min(logLevel_, util::kLevelWarning)) return;
   tell(level == broker::LogLevel::Error     ? "error: "
        : level == broker::LogLevel::Warning ? "warning: "
                                             : "",
@@ -182,8 +180,8 @@ void Session::log(broker::LogLevel level, std::string_view text) const {
 }
 
 bool Session::isThisHost(std::string_view name) const {
-  return isRemote() || schema::sameName(name, "localhost") || schema::sameName(name, tree()->systemName()) ||
-         schema::sameName(name, zorva::agent::currentConfig().systemName);
+  return isRemote() || util::sameName(name, "localhost") || util::sameName(name, tree()->systemName()) ||
+         util::sameName(name, zorva::agent::currentConfig().systemName);
 }
 
 void requireLocal(const Arguments& arguments, const char* subcommand) {

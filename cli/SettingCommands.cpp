@@ -16,7 +16,7 @@
 #include "cli/Session.h"
 #include "cli/Text.h"
 #include "cli/ValueText.h"
-#include "schema/Names.h"
+#include "util/Names.h"
 
 namespace zorva::cli {
 
@@ -147,7 +147,7 @@ bool sameServer(const std::string& a, const std::string& b) {
 
 bool sameSuffix(const std::string& a, const std::string& b) {
   const auto plain = [](std::string_view text) { return text.substr(0, text.size() - (text.ends_with('.') ? 1 : 0)); };
-  return schema::sameName(plain(a), plain(b));
+  return util::sameName(plain(a), plain(b));
 }
 
 using Same = bool (*)(const std::string& a, const std::string& b);

@@ -11,30 +11,17 @@
 #include <utility>
 
 #include "agent/Agent.h"
-#include "agent/files/ReadFile.h"
 #include "cli/Failure.h"
 #include "cli/Text.h"
+#include "util/FileDescriptor.h"
+#include "util/ReadFile.h"
+#include "util/ReplaceFile.h"
 
 namespace zorva::cli {
 
 namespace {
 
 constexpr std::size_t kLargestFile = std::size_t{16} << 20U;
-
-class Descriptor {
- public:
-  explicit Descriptor(int number) : number_(number) {}
-  ~Descriptor() {
-    if (number_ >= 0) ::close(number_);
-  }
-  Descriptor(const Descriptor&) = delete;
-  Descriptor& operator=(const Descriptor&) = delete;
-  int get() const noexcept { return number_; }
-  bool isOpen() const noexcept { return number_ >= 0; }
-
- private:
-  int number_;
-};
 
 [[noreturn]] void fail(const std::string& path, const std::string& what, const std::string& hint = {}) {
   throw Failure(ExitCode::Failed, printable(path) + ": " + what, hint);
@@ -45,7 +32,7 @@ class DraftFile {
  public:
   explicit DraftFile(const std::string& target)
       : path_(target + ".XXXXXX"), descriptor_(::mkostemp(path_.data(), O_CLOEXEC)) {
-    if (descriptor_.isOpen()) return;
+    if (descriptor_) return;
     const int error = errno;
     fail(target, std::string("cannot be written: ") + std::strerror(error),
          error == ENOENT ? "make the data directory, or name another: data_dir in the agent's configuration" : "");
@@ -58,25 +45,14 @@ class DraftFile {
 
   /// Writes it whole, to the disk. False with errno where that fails.
   bool fill(std::string_view text) const {
-    while (!text.empty()) {
-      const ssize_t written = ::write(descriptor_.get(), text.data(), text.size());
-      if (written < 0 && errno == EINTR) continue;
-      if (written < 0) return false;
-      text.remove_prefix(static_cast<std::size_t>(written));
-    }
-    return ::fchmod(descriptor_.get(), 0644) == 0 && ::fsync(descriptor_.get()) == 0;
+    return util::writeAll(descriptor_, text) && ::fchmod(descriptor_.get(), 0644) == 0 &&
+           ::fsync(descriptor_.get()) == 0;
   }
 
  private:
   std::string path_;
-  Descriptor descriptor_;
+  util::FileDescriptor descriptor_;
 };
-
-/// Makes a name that was put into a directory last.
-void syncDirectoryOf(const std::string& path) {
-  const Descriptor directory(::open(path.substr(0, path.rfind('/') + 1).c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-  if (directory.isOpen()) ::fsync(directory.get());
-}
 
 void requireLine(const std::string& path, const SettingLine& line) {
   const bool isBroken = std::any_of(line.value.begin(), line.value.end(),
@@ -113,7 +89,7 @@ SettingFile::SettingFile(const std::string& interface) : path_(zorva::agent::dat
 }
 
 std::string SettingFile::contents() const {
-  zorva::agent::FileText file = zorva::agent::readFile(path_, kLargestFile);
+  zorva::util::FileText file = zorva::util::readFile(path_, kLargestFile);
   if (file.error == EINVAL) fail(path_, "is no regular file");
   if (file.error != 0) {
     fail(path_, std::strerror(file.error), file.error == ENOENT ? "zorvactl ifcfg init makes it" : "");
@@ -157,7 +133,7 @@ void SettingFile::write(const std::vector<SettingLine>& lines, bool replaces) co
     fail(path_, error == EEXIST ? "stands already" : std::string("cannot be written: ") + std::strerror(error),
          error == EEXIST ? "--force puts a new file in its place" : "");
   }
-  syncDirectoryOf(path_);
+  util::syncDirectory(path_.substr(0, path_.rfind('/') + 1));
 }
 
 std::vector<SettingLine> settingsOfHost(const zorva::agent::Node& interface) {

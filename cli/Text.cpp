@@ -5,7 +5,7 @@
 #include <cstdio>
 #include <cwchar>
 
-#include "schema/Utf8.h"
+#include "util/Utf8.h"
 
 namespace zorva::cli {
 
@@ -54,9 +54,9 @@ std::size_t pieceEnd(std::string_view text, std::size_t width) {
   std::size_t columns = 0;
   std::size_t at = 0;
   while (at < text.size()) {
-    const std::size_t length = schema::utf8Length(text.substr(at));
+    const std::size_t length = util::utf8Length(text.substr(at));
     const std::size_t bytes = length == 0 ? 1 : length;
-    columns += length == 0 ? 1 : characterWidth(schema::utf8Decode(text.substr(at)));
+    columns += length == 0 ? 1 : characterWidth(util::utf8Decode(text.substr(at)));
     if (columns > width && at > 0) break;
     at += bytes;
   }
@@ -69,7 +69,7 @@ std::string printable(std::string_view text) {
   std::string out;
   out.reserve(text.size());
   while (!text.empty()) {
-    const std::size_t length = schema::utf8Length(text);
+    const std::size_t length = util::utf8Length(text);
     if (length == 0) {
       char escape[8];
       std::snprintf(escape, sizeof escape, "\\x%02X", static_cast<unsigned>(static_cast<unsigned char>(text[0])));
@@ -77,7 +77,7 @@ std::string printable(std::string_view text) {
       text.remove_prefix(1);
       continue;
     }
-    const std::uint32_t code = schema::utf8Decode(text);
+    const std::uint32_t code = util::utf8Decode(text);
     if (steersTerminal(code)) {
       appendEscape(out, code);
     } else {
@@ -91,8 +91,8 @@ std::string printable(std::string_view text) {
 std::size_t displayWidth(std::string_view text) {
   std::size_t columns = 0;
   while (!text.empty()) {
-    const std::size_t length = schema::utf8Length(text);
-    columns += length == 0 ? 1 : characterWidth(schema::utf8Decode(text));
+    const std::size_t length = util::utf8Length(text);
+    columns += length == 0 ? 1 : characterWidth(util::utf8Decode(text));
     text.remove_prefix(length == 0 ? 1 : length);
   }
   return columns;
@@ -128,17 +128,13 @@ std::string asUtf8(std::string_view text) {
   std::string out;
   out.reserve(text.size());
   while (!text.empty()) {
-    const std::size_t length = schema::utf8Length(text);
+    const std::size_t length = util::utf8Length(text);
     if (length > 0) {
       out += text.substr(0, length);
       text.remove_prefix(length);
       continue;
     }
-    const std::uint32_t code = 0x10EE00U + static_cast<unsigned char>(text[0]);
-    for (const std::uint32_t byte : {0xF0U | (code >> 18U), 0x80U | ((code >> 12U) & 0x3FU),
-                                     0x80U | ((code >> 6U) & 0x3FU), 0x80U | (code & 0x3FU)}) {
-      out += static_cast<char>(static_cast<unsigned char>(byte));
-    }
+    util::utf8Append(out, 0x10EE00U + static_cast<unsigned char>(text[0]));
     text.remove_prefix(1);
   }
   return out;

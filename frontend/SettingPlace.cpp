@@ -11,9 +11,9 @@
 #include <exception>
 
 #include "agent/Agent.h"
-#include "agent/files/ReadFile.h"
 #include "frontend/SettingsClaims.h"
-#include "schema/Names.h"
+#include "util/Names.h"
+#include "util/ReadFile.h"
 
 namespace zorva::frontend {
 
@@ -70,8 +70,8 @@ std::optional<std::string> fileAbsence(const std::string& interface) {
 std::optional<std::string> lineProblem(const std::string& interface, std::string_view key) {
   constexpr std::size_t kLargestFile = std::size_t{16} << 20U;
   const std::string path = fileOf(interface);
-  const zorva::agent::FileText file = zorva::agent::readFile(path, kLargestFile);
-  if (file.error != 0) return path + ": " + zorva::agent::fileErrorText(file.error);
+  const zorva::util::FileText file = zorva::util::readFile(path, kLargestFile);
+  if (file.error != 0) return path + ": " + zorva::util::fileErrorText(file.error);
   if (file.truncated) return path + " is larger than 16 MiB";
   // If the disk is full, the line may be missing for that reason.
   if (auto problem = writingProblem(path)) return problem;
@@ -82,7 +82,7 @@ std::optional<std::string> lineProblem(const std::string& interface, std::string
 }
 
 std::string interfaceOf(const broker::Instance& instance) {
-  if (schema::sameName(instance.path.className, kGeneralSettingClass)) {
+  if (util::sameName(instance.path.className, kGeneralSettingClass)) {
     return interfaceOfHostSettings(*zorva::agent::currentTree()).value_or("");
   }
   const broker::Value* id = instance.property("InstanceID");
@@ -94,7 +94,7 @@ std::string interfaceOf(const broker::Instance& instance) {
 
 const char* settingKey(std::string_view className, std::string_view property) noexcept {
   const auto found = std::find_if(std::begin(kFileSettings), std::end(kFileSettings), [&](const FileSetting& each) {
-    return schema::sameName(className, each.className) && schema::sameName(each.property, property);
+    return util::sameName(className, each.className) && util::sameName(each.property, property);
   });
   return found == std::end(kFileSettings) ? nullptr : found->key;
 }
@@ -106,7 +106,7 @@ std::optional<std::string> missingPlace(const broker::Instance& instance, std::s
       const auto absence = fileAbsence(interface);
       return absence ? absence : lineProblem(interface, key);
     }
-    if (!schema::sameName(instance.path.className, kEndpointClass)) return std::nullopt;
+    if (!util::sameName(instance.path.className, kEndpointClass)) return std::nullopt;
     const auto absence = missingDirectory();
     return absence ? absence : writingProblem(zorva::agent::dataDirectory());
   } catch (const std::exception& problem) {  // the configuration or the tree cannot be read

@@ -5,7 +5,7 @@
 #include <utility>
 
 #include "agent/Agent.h"
-#include "schema/Names.h"
+#include "util/Names.h"
 
 namespace zorva::frontend {
 
@@ -24,7 +24,7 @@ constexpr const char* kReadsFiles[] = {kSettingClass,
 constexpr const char* kChanges[] = {kSettingClass, kGeneralSettingClass, kEndpointClass};
 
 bool isNamed(std::string_view className, const char* const* first, const char* const* last) {
-  return std::any_of(first, last, [className](const char* each) { return schema::sameName(each, className); });
+  return std::any_of(first, last, [className](const char* each) { return util::sameName(each, className); });
 }
 
 bool needsClaim(Access access, std::string_view className) {
@@ -34,10 +34,10 @@ bool needsClaim(Access access, std::string_view className) {
 
 /// Empty if the change does not write to a file.
 std::string interfaceOfFile(const broker::ObjectPath& changed) {
-  if (schema::sameName(changed.className, kGeneralSettingClass)) {
+  if (util::sameName(changed.className, kGeneralSettingClass)) {
     return interfaceOfHostSettings(*zorva::agent::currentTree()).value_or("");
   }
-  if (!schema::sameName(changed.className, kSettingClass)) return {};
+  if (!util::sameName(changed.className, kSettingClass)) return {};
   const broker::Value* id = changed.key("InstanceID");
   return id == nullptr ? std::string() : interfaceOfId(id->asText());
 }

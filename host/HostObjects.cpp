@@ -3,10 +3,12 @@
 #include <systemd/sd-id128.h>
 
 #include <array>
-#include <fstream>
 #include <set>
+#include <string_view>
 
 #include "host/SubnetMask.h"
+#include "util/ReadFile.h"
+#include "util/Text.h"
 
 namespace zorva::host {
 
@@ -40,11 +42,9 @@ constexpr std::uint16_t kIPv6 = 4097;
 
 // The first line of a small file; empty if it cannot be read.
 std::string firstLine(const char* path) {
-  std::ifstream file(path);
-  std::string line;
-  std::getline(file, line);
-  const std::size_t end = line.find_last_not_of(" \t\r");
-  return end == std::string::npos ? "" : line.substr(0, end + 1);
+  constexpr std::size_t kLargestFile = 4096;
+  const std::string text = util::readFile(path, kLargestFile).text;
+  return std::string(util::trimmedEnd(std::string_view(text).substr(0, text.find('\n')), util::kWhiteSpace));
 }
 
 // A name for this machine that is the same at every start and does not reveal the machine's id, which must not leave

@@ -9,7 +9,7 @@
 #include <cstring>
 #include <optional>
 
-#include "http/Listener.h"
+#include "util/FileDescriptor.h"
 
 namespace zorva::http {
 
@@ -62,7 +62,7 @@ std::optional<std::uint32_t> ownerOf(const End& own, const End& other) {
   std::memcpy(request.body.id.idiag_dst, other.address, sizeof other.address);
   request.body.id.idiag_cookie[0] = request.body.id.idiag_cookie[1] = INET_DIAG_NOCOOKIE;
 
-  const Descriptor kernel(::socket(AF_NETLINK, SOCK_RAW | SOCK_CLOEXEC, NETLINK_SOCK_DIAG));
+  const util::FileDescriptor kernel(::socket(AF_NETLINK, SOCK_RAW | SOCK_CLOEXEC, NETLINK_SOCK_DIAG));
   if (!kernel || ::send(kernel.get(), &request, sizeof request, 0) < 0) return std::nullopt;
   alignas(nlmsghdr) char answer[1024];
   // The kernel has answered when send() returns.

@@ -8,7 +8,7 @@
 
 #include <cstring>
 
-#include "http/Listener.h"
+#include "util/FileDescriptor.h"
 
 namespace zorva::http {
 namespace {
@@ -31,8 +31,8 @@ class Host {
     ::getsockname(socket_.get(), reinterpret_cast<sockaddr*>(&address_), &size);
   }
 
-  Descriptor connectFrom(const char* address) const {
-    Descriptor client(::socket(AF_INET, SOCK_STREAM, 0));
+  util::FileDescriptor connectFrom(const char* address) const {
+    util::FileDescriptor client(::socket(AF_INET, SOCK_STREAM, 0));
     const sockaddr_in name = loopback(address);
     EXPECT_EQ(::bind(client.get(), reinterpret_cast<const sockaddr*>(&name), sizeof name), 0);
     EXPECT_EQ(::connect(client.get(), reinterpret_cast<const sockaddr*>(&address_), sizeof address_), 0);
@@ -42,22 +42,22 @@ class Host {
   std::string next() const {
     sockaddr_storage peer{};
     socklen_t size = sizeof peer;
-    const Descriptor taken(::accept(socket_.get(), reinterpret_cast<sockaddr*>(&peer), &size));
+    const util::FileDescriptor taken(::accept(socket_.get(), reinterpret_cast<sockaddr*>(&peer), &size));
     return clientOf(taken.get(), peer);
   }
 
  private:
-  Descriptor socket_;
+  util::FileDescriptor socket_;
   sockaddr_in address_{};
 };
 
 TEST(ClientIdentity, IsTheUserWhicheverLoopbackAddressAndPortAreUsed) {
   const Host host;
-  const Descriptor one = host.connectFrom("127.0.0.1");
+  const util::FileDescriptor one = host.connectFrom("127.0.0.1");
   const std::string client = host.next();
   if (client == "this host") GTEST_SKIP() << "the kernel does not say who owns a socket";
   EXPECT_EQ(client, "user " + std::to_string(::getuid()));
-  const Descriptor other = host.connectFrom("127.0.0.7");
+  const util::FileDescriptor other = host.connectFrom("127.0.0.7");
   EXPECT_EQ(host.next(), client);
 }
 
@@ -70,7 +70,7 @@ TEST(ClientIdentity, TellsUsersApart) {
   const pid_t child = ::fork();
   if (child == 0) {
     const bool changed = ::setuid(kOther) == 0;
-    const Descriptor connection = changed ? host.connectFrom("127.0.0.1") : Descriptor();
+    const util::FileDescriptor connection = changed ? host.connectFrom("127.0.0.1") : util::FileDescriptor();
     char byte = 0;
     ::close(ends[1]);
     ::_exit(::read(ends[0], &byte, 1) == 0 ? 0 : 1);

@@ -96,7 +96,7 @@ Listener listenOnOne(const sockaddr_storage& address) {
   Listener listener;
   const int socket = ::socket(address.ss_family, SOCK_STREAM | SOCK_NONBLOCK | SOCK_CLOEXEC, 0);
   if (socket < 0) return listener;
-  Descriptor owned(socket);
+  util::FileDescriptor owned(socket);
   const int on = 1;
   ::setsockopt(socket, SOL_SOCKET, SO_REUSEADDR, &on, sizeof on);
   if (address.ss_family == AF_INET6) ::setsockopt(socket, IPPROTO_IPV6, IPV6_V6ONLY, &on, sizeof on);
@@ -129,19 +129,6 @@ std::vector<Listener> listenOnce(const Addresses& addresses, int port, bool mayL
 
 }  // namespace
 
-Descriptor::~Descriptor() {
-  if (descriptor_ >= 0) ::close(descriptor_);
-}
-
-Descriptor& Descriptor::operator=(Descriptor&& other) noexcept {
-  if (this == &other) return *this;
-  if (descriptor_ >= 0) ::close(descriptor_);
-  descriptor_ = other.release();
-  return *this;
-}
-
-int Descriptor::release() noexcept { return std::exchange(descriptor_, -1); }
-
 void checkAddresses(const Addresses& addresses) {
   for (const std::string& text : addresses) parseLoopback(text, 0);
 }
@@ -158,7 +145,7 @@ std::vector<Listener> listenOn(const std::optional<Addresses>& addresses, int po
 std::vector<Listener> adoptListeners(int count) {
   std::vector<Listener> listeners;
   for (int descriptor = kFirstInherited; descriptor < kFirstInherited + count; ++descriptor) {
-    Listener listener{Descriptor(descriptor), {}};
+    Listener listener{util::FileDescriptor(descriptor), {}};
     const std::string name = "the socket that was handed over as descriptor " + std::to_string(descriptor);
     int listens = 0;
     socklen_t size = sizeof listens;

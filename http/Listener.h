@@ -4,6 +4,8 @@
 #include <string>
 #include <vector>
 
+#include "util/FileDescriptor.h"
+
 // The sockets on which the server waits for clients. The server does not authenticate clients, so it listens only on
 // loopback addresses: 127.0.0.0/8 and ::1.
 
@@ -12,26 +14,9 @@ namespace zorva::http {
 /// One listening address as text: "127.0.0.1", "::1".
 using Addresses = std::vector<std::string>;
 
-/// A file descriptor, closed at the end.
-class Descriptor {
- public:
-  Descriptor() = default;
-  explicit Descriptor(int descriptor) : descriptor_(descriptor) {}
-  ~Descriptor();
-  Descriptor(Descriptor&& other) noexcept : descriptor_(other.release()) {}
-  Descriptor& operator=(Descriptor&& other) noexcept;
-
-  int get() const noexcept { return descriptor_; }
-  int release() noexcept;
-  explicit operator bool() const noexcept { return descriptor_ >= 0; }
-
- private:
-  int descriptor_ = -1;
-};
-
 /// One listening socket, non-blocking and close-on-exec.
 struct Listener {
-  Descriptor socket;
+  util::FileDescriptor socket;
   std::string url;  ///< "http://127.0.0.1:5988"
 };
 

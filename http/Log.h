@@ -2,6 +2,8 @@
 
 #include <string>
 
+#include "util/LogLevels.h"
+
 // The server's lines in the agent's log, to which the providers of the process write too. Thread-safe; nothing here
 // throws.
 
@@ -9,10 +11,11 @@ namespace zorva::http {
 
 /// On the scale of the agent's levels.
 enum class Level : int {
-  Request = 4500,  ///< a line for each request; the providers' lines about their work have lower levels
-  Change = 5000,   ///< which client changed what
-  Warning = 5000,  ///< requests that were refused, clients that were cut off, providers that do not return
-  Error = 6000,    ///< errors of the server itself
+  Request = 4500,                ///< a line for each request; the providers' lines about their work have lower levels
+  Change = util::kLevelWarning,  ///< which client changed what
+  Warning =
+      util::kLevelWarning,    ///< requests that were refused, clients that were cut off, providers that do not return
+  Error = util::kLevelError,  ///< errors of the server itself
 };
 
 void logLine(Level level, const std::string& text, const char* function, const char* file, int line) noexcept;

@@ -5,24 +5,15 @@
 #include <cstdint>
 #include <vector>
 
+#include "util/Names.h"
+#include "util/Text.h"
+
 namespace zorva::http {
 
 namespace {
 
 constexpr std::string_view kHeaderMismatch = "header-mismatch";
 constexpr std::string_view kNotValid = "request-not-valid";
-
-char lower(char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c; }
-
-bool equalNames(std::string_view a, std::string_view b) {
-  return std::equal(a.begin(), a.end(), b.begin(), b.end(), [](char x, char y) { return lower(x) == lower(y); });
-}
-
-std::string_view trimmed(std::string_view text) {
-  const std::size_t begin = text.find_first_not_of(" \t");
-  if (begin == std::string_view::npos) return {};
-  return text.substr(begin, text.find_last_not_of(" \t") - begin + 1);
-}
 
 /// The pieces between commas or semicolons, without surrounding blanks; empty ones are left out. A separator within
 /// quotes does not count.
@@ -33,14 +24,15 @@ std::vector<std::string_view> split(std::string_view text, char separator) {
   for (std::size_t i = 0; i <= text.size(); ++i) {
     if (i < text.size() && text[i] == '"') quoted = !quoted;
     if (i < text.size() && (quoted || text[i] != separator)) continue;
-    if (const std::string_view piece = trimmed(text.substr(begin, i - begin)); !piece.empty()) pieces.push_back(piece);
+    if (const std::string_view piece = util::trimmed(text.substr(begin, i - begin)); !piece.empty())
+      pieces.push_back(piece);
     begin = i + 1;
   }
   return pieces;
 }
 
 bool isTokenCharacter(char c) {
-  const bool letter = lower(c) >= 'a' && lower(c) <= 'z';
+  const bool letter = util::lowerAscii(c) >= 'a' && util::lowerAscii(c) <= 'z';
   return letter || (c >= '0' && c <= '9') || std::string_view("!#$%&'*+-.^_`|~").find(c) != std::string_view::npos;
 }
 
@@ -63,8 +55,8 @@ std::string_view withoutPrefix(std::string_view name) {
 bool isSingle(std::string_view name) {
   constexpr std::string_view kSingle[] = {"Host", "Content-Length", "Transfer-Encoding", "Content-Type",
                                           "Man",  "Authorization",  "Content-Encoding"};
-  return std::any_of(std::begin(kSingle), std::end(kSingle), [&](auto each) { return equalNames(each, name); }) ||
-         equalNames(name.substr(0, 3), "CIM");
+  return std::any_of(std::begin(kSingle), std::end(kSingle), [&](auto each) { return util::sameName(each, name); }) ||
+         util::sameName(name.substr(0, 3), "CIM");
 }
 
 std::optional<Refusal> checkFields(const HeaderList& headers) {
@@ -75,8 +67,8 @@ std::optional<Refusal> checkFields(const HeaderList& headers) {
     const std::string_view bare = withoutPrefix(name);
     if (!isSingle(bare)) continue;
     for (std::size_t k = 0; k < i; ++k) {
-      if (!equalNames(withoutPrefix(headers[k].first), bare)) continue;
-      const bool isCim = equalNames(bare.substr(0, 3), "CIM") || equalNames(bare, "Man");
+      if (!util::sameName(withoutPrefix(headers[k].first), bare)) continue;
+      const bool isCim = util::sameName(bare.substr(0, 3), "CIM") || util::sameName(bare, "Man");
       return bad("the header field " + std::string(bare) + " is given twice", isCim ? kHeaderMismatch : kNotValid);
     }
   }
@@ -90,7 +82,7 @@ std::optional<Refusal> checkFraming(const RequestHead& head, std::size_t most) {
   if (length != nullptr && coding != nullptr) return bad("it has both Content-Length and Transfer-Encoding");
   if (coding != nullptr) {
     if (head.version != "HTTP/1.1") return bad("Transfer-Encoding belongs to HTTP/1.1");
-    if (!equalNames(*coding, "chunked")) return bad("the only Transfer-Encoding that this server takes is chunked");
+    if (!util::sameName(*coding, "chunked")) return bad("the only Transfer-Encoding that this server takes is chunked");
   }
   if (length != nullptr) {
     std::uint64_t bytes = 0;
@@ -120,23 +112,24 @@ bool isUtf8Name(std::string_view charset) {
   if (charset.size() >= 2 && charset.front() == '"' && charset.back() == '"') {
     charset = charset.substr(1, charset.size() - 2);
   }
-  return equalNames(charset, "utf-8") || equalNames(charset, "utf8") || equalNames(charset, "us-ascii");
+  return util::sameName(charset, "utf-8") || util::sameName(charset, "utf8") || util::sameName(charset, "us-ascii");
 }
 
 std::optional<Refusal> checkContent(const HeaderList& headers) {
   if (const std::string* coding = findHeader(headers, "Content-Encoding")) {
-    if (!equalNames(*coding, "identity")) return Refusal{415, "a request's body must not be encoded", {}};
+    if (!util::sameName(*coding, "identity")) return Refusal{415, "a request's body must not be encoded", {}};
   }
   const std::string* type = findHeader(headers, "Content-Type");
   if (type == nullptr) return std::nullopt;
   const auto parts = split(*type, ';');
-  if (parts.empty() || !(equalNames(parts[0], "application/xml") || equalNames(parts[0], "text/xml"))) {
+  if (parts.empty() || !(util::sameName(parts[0], "application/xml") || util::sameName(parts[0], "text/xml"))) {
     return Refusal{415, "Content-Type must be application/xml or text/xml", {}};
   }
   for (std::size_t i = 1; i < parts.size(); ++i) {
     const std::size_t equals = parts[i].find('=');
-    if (equals == std::string_view::npos || !equalNames(trimmed(parts[i].substr(0, equals)), "charset")) continue;
-    if (!isUtf8Name(trimmed(parts[i].substr(equals + 1)))) return bad("the charset of a request must be utf-8");
+    if (equals == std::string_view::npos || !util::sameName(util::trimmed(parts[i].substr(0, equals)), "charset"))
+      continue;
+    if (!isUtf8Name(util::trimmed(parts[i].substr(equals + 1)))) return bad("the charset of a request must be utf-8");
   }
   return std::nullopt;
 }
@@ -158,7 +151,7 @@ std::optional<Refusal> checkAccept(const HeaderList& headers) {
 
 std::optional<Refusal> checkExpect(const HeaderList& headers) {
   for (const auto& [name, value] : headers) {
-    if (equalNames(name, "Expect") && !equalNames(value, "100-continue")) {
+    if (util::sameName(name, "Expect") && !util::sameName(value, "100-continue")) {
       return Refusal{417, "this server knows no expectation but 100-continue", {}};
     }
   }
@@ -166,7 +159,7 @@ std::optional<Refusal> checkExpect(const HeaderList& headers) {
 }
 
 bool isZeroWeight(std::string_view parameter) {
-  if (parameter.size() < 3 || lower(parameter[0]) != 'q' || parameter[1] != '=') return false;
+  if (parameter.size() < 3 || util::lowerAscii(parameter[0]) != 'q' || parameter[1] != '=') return false;
   return parameter.substr(2).find_first_not_of("0.") == std::string_view::npos;
 }
 
@@ -174,17 +167,17 @@ bool isZeroWeight(std::string_view parameter) {
 
 const std::string* findHeader(const HeaderList& headers, std::string_view name) {
   for (const auto& [each, value] : headers) {
-    if (equalNames(each, name)) return &value;
+    if (util::sameName(each, name)) return &value;
   }
   return nullptr;
 }
 
 bool listHas(const HeaderList& headers, std::string_view name, std::string_view word) {
   for (const auto& [each, value] : headers) {
-    if (!equalNames(each, name)) continue;
+    if (!util::sameName(each, name)) continue;
     for (const std::string_view element : split(value, ',')) {
       const auto parts = split(element, ';');
-      if (parts.empty() || !equalNames(parts[0], word)) continue;
+      if (parts.empty() || !util::sameName(parts[0], word)) continue;
       return std::none_of(parts.begin() + 1, parts.end(), isZeroWeight);
     }
   }

@@ -79,7 +79,7 @@ Qualifiers ownOnly(const Qualifiers& qualifiers) {
 template <typename Element>
 std::size_t indexOf(const std::vector<const Element*>& elements, std::string_view name) {
   std::size_t i = 0;
-  while (i < elements.size() && !sameName(elements[i]->name, name)) ++i;
+  while (i < elements.size() && !util::sameName(elements[i]->name, name)) ++i;
   return i;
 }
 
@@ -247,7 +247,7 @@ void ClassBuilder::addMethod(Method& declared) {
   for (std::size_t i = 0; i < method->parameters.size(); ++i) {
     Parameter& parameter = method->parameters[i];
     const Element which{"parameter", parameter.name, method->name};
-    const auto same = [&](const Parameter& other) { return sameName(other.name, parameter.name); };
+    const auto same = [&](const Parameter& other) { return util::sameName(other.name, parameter.name); };
     if (std::any_of(method->parameters.begin(), method->parameters.begin() + static_cast<std::ptrdiff_t>(i), same)) {
       refuse(parameter.place, which.text() + " is declared twice");
     }
@@ -281,14 +281,14 @@ void ClassBuilder::checkOverrideQualifier(const Qualifiers& qualifiers, Element 
   }
   std::string_view target = textOf(*qualifier->value);
   if (const std::size_t dot = target.rfind('.'); dot != std::string_view::npos) target.remove_prefix(dot + 1);
-  if (!overrides || !sameName(target, element.name)) {
+  if (!overrides || !util::sameName(target, element.name)) {
     refuse(qualifier->place,
            element.text() + " overrides " + quote(textOf(*qualifier->value)) + ", which it does not inherit");
   }
 }
 
 const Class* ClassBuilder::resolveReference(std::string_view name, Element user, Place place) const {
-  if (sameName(name, class_->name_)) return class_.get();
+  if (util::sameName(name, class_->name_)) return class_.get();
   const Class* found = repository_.find(name);
   if (found == nullptr) refuse(place, "class " + quote(name) + " of " + user.text() + " is not declared");
   return found;
@@ -335,7 +335,7 @@ void ClassBuilder::mergeQualifiers(Qualifiers& own, const Qualifiers& inherited,
 
 void ClassBuilder::index() {
   for (const ClassProperty* property : class_->properties_) {
-    class_->propertyHashes_.push_back(nameHash(property->name));
+    class_->propertyHashes_.push_back(util::nameHash(property->name));
     if (property->isKey) class_->keys_.push_back(property);
     if (property->type == Type::Reference) class_->references_.push_back(property);
   }
@@ -348,9 +348,9 @@ void ClassBuilder::index() {
 Class::~Class() = default;
 
 const ClassProperty* Class::findProperty(std::string_view name) const noexcept {
-  const std::uint32_t hash = nameHash(name);
+  const std::uint32_t hash = util::nameHash(name);
   for (std::size_t i = 0; i < properties_.size(); ++i) {
-    if (propertyHashes_[i] == hash && sameName(properties_[i]->name, name)) return properties_[i];
+    if (propertyHashes_[i] == hash && util::sameName(properties_[i]->name, name)) return properties_[i];
   }
   return nullptr;
 }
@@ -374,7 +374,7 @@ bool Class::isA(const Class& ancestor) const noexcept {
 
 bool Class::isA(std::string_view ancestor) const noexcept {
   for (const Class* at = this; at != nullptr; at = at->superclass_) {
-    if (sameName(at->name_, ancestor)) return true;
+    if (util::sameName(at->name_, ancestor)) return true;
   }
   return false;
 }

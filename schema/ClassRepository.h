@@ -9,7 +9,7 @@
 #include <vector>
 
 #include "schema/Declarations.h"
-#include "schema/Names.h"
+#include "util/Names.h"
 
 // The classes of a namespace with everything that they inherit, and the questions that a broker or a server asks of
 // them.
@@ -96,7 +96,7 @@ class Class {
   std::vector<std::unique_ptr<ClassMethod>> ownMethods_;
   std::vector<std::unique_ptr<ClassMethod>> bequeathedMethods_;
   std::vector<const ClassProperty*> properties_;
-  std::vector<std::uint32_t> propertyHashes_;  // nameHash of properties_[i]->name: a look-up compares few names
+  std::vector<std::uint32_t> propertyHashes_;  // util::nameHash of properties_[i]->name: a look-up compares few names
   std::vector<const ClassMethod*> methods_;
   std::vector<const ClassProperty*> keys_;
   std::vector<const ClassProperty*> references_;
@@ -146,9 +146,9 @@ class ClassRepository {
   const std::vector<const QualifierType*>& qualifierTypes() const noexcept { return qualifierOrder_; }
 
  private:
-  std::unordered_map<std::string_view, std::unique_ptr<Class>, NameHash, NameEqual>
+  std::unordered_map<std::string_view, std::unique_ptr<Class>, util::NameHash, util::NameEqual>
       classes_;  // keys: the classes' names
-  std::unordered_map<std::string_view, std::unique_ptr<QualifierType>, NameHash, NameEqual> qualifierTypes_;
+  std::unordered_map<std::string_view, std::unique_ptr<QualifierType>, util::NameHash, util::NameEqual> qualifierTypes_;
   std::vector<const Class*> order_;
   std::vector<const QualifierType*> qualifierOrder_;
   std::size_t inheritedBytes_ = 0;

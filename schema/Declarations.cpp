@@ -4,7 +4,7 @@
 #include <cmath>
 #include <limits>
 
-#include "schema/Names.h"
+#include "util/Names.h"
 
 namespace zorva::schema {
 
@@ -103,7 +103,7 @@ std::string_view typeName(Type type) noexcept { return kTypeNames[static_cast<st
 
 std::optional<Type> typeFromName(std::string_view name) noexcept {
   for (std::size_t i = 0; i + 1 < kTypeNames.size(); ++i) {
-    if (sameName(name, kTypeNames[i])) return static_cast<Type>(i);
+    if (util::sameName(name, kTypeNames[i])) return static_cast<Type>(i);
   }
   return std::nullopt;
 }
@@ -181,7 +181,7 @@ std::string_view textOf(const Value& value) noexcept {
 
 const Qualifier* findQualifier(const Qualifiers& qualifiers, std::string_view name) noexcept {
   for (const Qualifier& qualifier : qualifiers) {
-    if (sameName(qualifier.name, name)) return &qualifier;
+    if (util::sameName(qualifier.name, name)) return &qualifier;
   }
   return nullptr;
 }

@@ -2,8 +2,6 @@
 
 #include <gtest/gtest.h>
 
-#include "schema/Names.h"
-
 namespace zorva::schema {
 namespace {
 
@@ -16,23 +14,6 @@ Scalar fitted(Scalar scalar, Type type) {
   Value value = Value::of(std::move(scalar));
   EXPECT_EQ(fitValue(value, type, false), std::nullopt);
   return value.scalar;
-}
-
-TEST(Names, AreTheSameInAnyCase) {
-  EXPECT_TRUE(sameName("ZORVA_DNSProtocolEndPoint", "zorva_dnsprotocolendpoint"));
-  EXPECT_FALSE(sameName("Name", "Names"));
-  EXPECT_FALSE(sameName("Name", "Mane"));
-  EXPECT_EQ(nameHash("NameFormat"), nameHash("nAMEfORMAT"));
-  EXPECT_TRUE(sameName("", ""));
-}
-
-TEST(Names, ComparesOtherLettersAsTheyStand) { EXPECT_FALSE(sameName("\xC3\xA4", "\xC3\x84")); }
-
-TEST(Names, AreOrderedWithoutRegardToCase) {
-  EXPECT_TRUE(NameLess()("alpha", "BETA"));
-  EXPECT_FALSE(NameLess()("BETA", "alpha"));
-  EXPECT_FALSE(NameLess()("Alpha", "alpha"));
-  EXPECT_TRUE(NameLess()("Alpha", "alphabet"));
 }
 
 TEST(Types, HaveTheirMofKeywords) {

@@ -5,8 +5,8 @@
 #include <limits>
 #include <optional>
 
-#include "schema/Names.h"
-#include "schema/Utf8.h"
+#include "util/Names.h"
+#include "util/Utf8.h"
 
 namespace zorva::schema {
 
@@ -19,7 +19,7 @@ constexpr bool isBlank(char c) noexcept { return c == ' ' || c == '\t' || c == '
 
 int hexDigit(char c) noexcept {
   if (isDigit(c)) return c - '0';
-  const char small = lowerAscii(c);
+  const char small = util::lowerAscii(c);
   return small >= 'a' && small <= 'f' ? small - 'a' + 10 : -1;
 }
 
@@ -39,10 +39,10 @@ struct WholeNumber {
 
 WholeNumber wholeNumber(std::string_view digits) {
   int base = 10;
-  if (digits.size() > 2 && digits[0] == '0' && lowerAscii(digits[1]) == 'x') {
+  if (digits.size() > 2 && digits[0] == '0' && util::lowerAscii(digits[1]) == 'x') {
     base = 16;
     digits.remove_prefix(2);
-  } else if (digits.size() > 1 && lowerAscii(digits.back()) == 'b') {
+  } else if (digits.size() > 1 && util::lowerAscii(digits.back()) == 'b') {
     base = 2;
     digits.remove_suffix(1);
   } else if (digits.size() > 1 && digits[0] == '0') {
@@ -78,13 +78,14 @@ bool looksReal(std::string_view text) noexcept {
 }  // namespace
 
 bool Token::isWord(std::string_view word) const noexcept {
-  return kind == TokenKind::Identifier && sameName(lexeme, word);
+  return kind == TokenKind::Identifier && util::sameName(lexeme, word);
 }
 
 std::string Token::describe() const {
   if (kind == TokenKind::End) return "the end of the text";
   constexpr std::size_t longest = 40;
-  const std::string_view part = lexeme.substr(0, lexeme.size() > longest ? utf8Cut(lexeme, longest) : lexeme.size());
+  const std::string_view part =
+      lexeme.substr(0, lexeme.size() > longest ? util::utf8Cut(lexeme, longest) : lexeme.size());
   std::string shown(part);
   if (part.size() < lexeme.size()) shown += "...";
   return kind == TokenKind::String || kind == TokenKind::Character ? shown : "'" + shown + "'";
@@ -168,7 +169,7 @@ void MofLexer::skipLongComment() {
 }
 
 std::size_t MofLexer::utf8LengthHere() const {
-  const std::size_t length = utf8Length(text_.substr(at_));
+  const std::size_t length = util::utf8Length(text_.substr(at_));
   if (length == 0) fail(here(), "expected UTF-8, found " + byteName(text_[at_]));
   return length;
 }
@@ -201,7 +202,7 @@ void MofLexer::readPragma() {
   while (at_ < text_.size() && (isLetter(text_[at_]) || isDigit(text_[at_]))) ++at_;
   token_.kind = TokenKind::Pragma;
   token_.lexeme = text_.substr(begin, at_ - begin);
-  if (!sameName(token_.lexeme, "#pragma")) fail(token_.place, "expected '#pragma', found " + token_.describe());
+  if (!util::sameName(token_.lexeme, "#pragma")) fail(token_.place, "expected '#pragma', found " + token_.describe());
 }
 
 void MofLexer::readString() {
@@ -235,7 +236,7 @@ void MofLexer::readCharacter() {
     fail(token_.place, "expected one character between single quotes");
   }
   ++at_;
-  const std::uint32_t code = utf8Decode(one);
+  const std::uint32_t code = util::utf8Decode(one);
   if (code > 0xFFFF) fail(token_.place, "expected a character that 16 bits can hold");
   token_.number = static_cast<char16_t>(code);
   token_.lexeme = text_.substr(begin, at_ - begin);
@@ -275,7 +276,7 @@ void MofLexer::readEscapeInto(std::string& out) {
   }
   if (digits == 0) fail(place, "expected one to four hexadecimal digits after '\\x'");
   if (code == 0 || (code >= 0xD800 && code <= 0xDFFF)) fail(place, "expected a character, found an escape for none");
-  utf8Append(out, code);
+  util::utf8Append(out, code);
 }
 
 void MofLexer::readNumber() {
@@ -283,11 +284,11 @@ void MofLexer::readNumber() {
   const bool negative = text_[at_] == '-';
   if (negative || text_[at_] == '+') ++at_;
   const std::size_t digits = at_;
-  const bool hexadecimal = at_ + 1 < text_.size() && lowerAscii(text_[at_ + 1]) == 'x';
+  const bool hexadecimal = at_ + 1 < text_.size() && util::lowerAscii(text_[at_ + 1]) == 'x';
   while (at_ < text_.size()) {
     const char c = text_[at_];
     const bool exponentSign =
-        (c == '+' || c == '-') && !hexadecimal && at_ > digits && lowerAscii(text_[at_ - 1]) == 'e';
+        (c == '+' || c == '-') && !hexadecimal && at_ > digits && util::lowerAscii(text_[at_ - 1]) == 'e';
     if (!isDigit(c) && !isLetter(c) && c != '.' && !exponentSign) break;
     ++at_;
   }

@@ -1,7 +1,3 @@
-#include <fcntl.h>
-#include <sys/stat.h>
-#include <unistd.h>
-
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
@@ -9,6 +5,8 @@
 
 #include "schema/Mof.h"
 #include "schema/MofLexer.h"
+#include "util/Names.h"
+#include "util/ReadFile.h"
 
 namespace zorva::schema {
 
@@ -122,7 +120,7 @@ void MofParser::parsePragma() {
   take('(', "after the name of a directive");
   const std::string argument = parseString();
   if (!token().is(')')) unexpected("')' that closes the directive");
-  if (sameName(name, "include")) include(argument, at);
+  if (util::sameName(name, "include")) include(argument, at);
   lexer_.advance();
 }
 
@@ -452,27 +450,15 @@ void MofParser::hand(std::optional<SchemaError> refusal, Place at) const {
   throw MofFailure{std::move(*refusal)};
 }
 
-// A file's text, or why there is none. What is no regular file is not opened for reading: nothing may block on a FIFO.
+// A file's text, up to one byte over the limit, or why there is none.
 MofInclude readFile(const std::string& path, std::size_t limit) {
-  MofInclude read;
-  read.file = path;
-  const int fd = open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
-  if (fd < 0) {
-    read.error = std::strerror(errno);
-    return read;
-  }
-  struct stat state {};
-  if (fstat(fd, &state) != 0 || !S_ISREG(state.st_mode)) {
+  util::FileText file = util::readFile(path, limit + 1);
+  MofInclude read{path, std::move(file.text), {}};
+  if (file.error == EINVAL) {
     read.error = "it is no regular file";
-  } else {
-    char block[65536];
-    ssize_t count = 0;
-    while (read.text.size() <= limit && (count = ::read(fd, block, sizeof block)) > 0) {
-      read.text.append(block, static_cast<std::size_t>(count));
-    }
-    if (count < 0) read.error = std::strerror(errno);
+  } else if (file.error != 0) {
+    read.error = std::strerror(file.error);
   }
-  close(fd);
   return read;
 }
 

@@ -3,7 +3,7 @@
 #include <cmath>
 
 #include "schema/Mof.h"
-#include "schema/Utf8.h"
+#include "util/Utf8.h"
 
 namespace zorva::schema {
 
@@ -36,7 +36,7 @@ std::string escaped(std::string_view text) {
   std::string out;
   out.reserve(text.size());
   while (!text.empty()) {
-    const std::size_t length = utf8Length(text);
+    const std::size_t length = util::utf8Length(text);
     if (length == 0 || text[0] == '\0') {
       out.append("\xEF\xBF\xBD");
     } else {
@@ -54,7 +54,7 @@ std::size_t cutAt(std::string_view text, std::size_t width) {
   if (const std::size_t blank = text.rfind(' ', width - 1); blank != std::string_view::npos) return blank + 1;
   std::size_t cut = 0;
   for (std::size_t next = 0; next <= width;
-       next += text[next] == '\\' ? (text[next + 1] == 'x' ? 6 : 2) : utf8Length(text.substr(next))) {
+       next += text[next] == '\\' ? (text[next + 1] == 'x' ? 6 : 2) : util::utf8Length(text.substr(next))) {
     cut = next;
   }
   return cut;
@@ -90,7 +90,7 @@ std::string characterText(char16_t value) {
   if (value == u'"') return "'\"'";
   if (value == 0 || (value >= 0xD800 && value <= 0xDFFF)) return "'\xEF\xBF\xBD'";
   std::string character;
-  utf8Append(character, value);
+  util::utf8Append(character, value);
   return "'" + escaped(character) + "'";
 }
 

@@ -4,7 +4,7 @@
 
 #include "schema/BuiltInMof.h"
 #include "schema/Mof.h"
-#include "schema/Names.h"
+#include "util/Names.h"
 
 namespace zorva::schema {
 
@@ -37,7 +37,7 @@ std::shared_ptr<const ClassRepository> loadBuiltInClasses(ClassSet set) {
 }
 
 bool sameNamespace(std::string_view a, std::string_view b) noexcept {
-  return sameName(withoutSlashes(a), withoutSlashes(b));
+  return util::sameName(withoutSlashes(a), withoutSlashes(b));
 }
 
 }  // namespace zorva::schema

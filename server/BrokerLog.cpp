@@ -1,17 +1,12 @@
 #include "server/BrokerLog.h"
 
-#include <cstddef>
-
 #include "http/Log.h"
 
 namespace zorva::server {
 
 namespace {
 
-http::Level levelOf(broker::LogLevel level) {
-  constexpr int kLevels[] = {3000, 4000, 5000, 6000};
-  return static_cast<http::Level>(kLevels[static_cast<std::size_t>(level)]);
-}
+http::Level levelOf(broker::LogLevel level) { return static_cast<http::Level>(level); }
 
 }  // namespace
 

@@ -8,6 +8,7 @@
 #include "agent/config/Config.h"
 #include "http/HttpLimits.h"
 #include "http/Listener.h"
+#include "util/LogLevels.h"
 
 // The configuration of zorvacimd: a TOML 1.0 file, and the command line's values, which replace the file's.
 
@@ -40,7 +41,7 @@ struct Config {
   std::string providerDirectory;  ///< empty: beside the program
 
   // [log]
-  int logLevel = 5000;                   ///< lines below it are dropped
+  int logLevel = util::kLevelWarning;    ///< lines below it are dropped
   std::optional<std::string> logTarget;  ///< absent: the agent's default
 };
 

@@ -30,6 +30,7 @@
 #include "schema/Schema.h"
 #include "server/BrokerLog.h"
 #include "server/Systemd.h"
+#include "util/FileDescriptor.h"
 
 namespace zorva::server {
 
@@ -130,7 +131,7 @@ class Daemon {
 
   const CommandLine commandLine_;
   Config config_;
-  http::Descriptor signals_;
+  util::FileDescriptor signals_;
   std::vector<http::Listener> listeners_;
   std::unique_ptr<broker::Broker> broker_;
   std::unique_ptr<cimom::Service> service_;
@@ -147,7 +148,7 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
   const sigset_t signals = handledSignals();
   ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);  // inherited by all later threads
   ::signal(SIGPIPE, SIG_IGN);
-  signals_ = http::Descriptor(::signalfd(-1, &signals, SFD_NONBLOCK | SFD_CLOEXEC));
+  signals_ = util::FileDescriptor(::signalfd(-1, &signals, SFD_NONBLOCK | SFD_CLOEXEC));
   if (!signals_) throw std::runtime_error(std::string("cannot wait for signals: ") + std::strerror(errno));
 
   const int inherited = countOfInheritedSockets();

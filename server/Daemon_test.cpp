@@ -17,6 +17,7 @@
 
 #include "http/testing/TestWire.h"
 #include "server/testing/TestDaemon.h"
+#include "util/FileDescriptor.h"
 
 namespace zorva::server {
 namespace {
@@ -401,7 +402,7 @@ class NotifySocket {
  private:
   zorva::agent::testing::TemporaryDirectory directory_;
   std::string path_;
-  http::Descriptor socket_;
+  util::FileDescriptor socket_;
 };
 
 TEST(DaemonProcess, ReportsItsStateToTheServiceManager) {

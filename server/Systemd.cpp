@@ -11,7 +11,7 @@
 #include <cstring>
 #include <string>
 
-#include "http/Listener.h"
+#include "util/FileDescriptor.h"
 
 namespace zorva::server {
 
@@ -40,7 +40,7 @@ void notifyServiceManager(std::string_view state) {
   std::memcpy(address.sun_path, path, size);
   if (*path == '@') address.sun_path[0] = '\0';  // the abstract namespace: not a file
 
-  const http::Descriptor socket(::socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0));
+  const util::FileDescriptor socket(::socket(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0));
   if (!socket) return;
   const auto addressSize = static_cast<socklen_t>(offsetof(sockaddr_un, sun_path) + size);
   ::sendto(socket.get(), state.data(), state.size(), MSG_NOSIGNAL, reinterpret_cast<const sockaddr*>(&address),

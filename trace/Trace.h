@@ -9,6 +9,8 @@
 #include <tuple>
 #include <type_traits>
 
+#include "util/LogLevels.h"
+
 namespace ZV {
 
 // Selects the format of a line. A value that is not listed gives the entering format.
@@ -16,9 +18,9 @@ enum MessageType : int { MSG_ENTERING = 0, MSG_EXITING = 1, MSG_METHOD = 2, MSG_
 
 // The levels that the library writes at. The library tests no level: the logger drops lines.
 enum LogLevel : int {
-  LOG_LEVEL_FLOW = 3000,    // entry and exit lines with a parameter list
-  LOG_LEVEL_DETAIL = 4000,  // banners, provider entry and exit, values, failures that a walk survives
-  LOG_LEVEL_ERROR = 6000,   // failures that end or empty an operation
+  LOG_LEVEL_FLOW = zorva::util::kLevelFlow,
+  LOG_LEVEL_DETAIL = zorva::util::kLevelDetail,
+  LOG_LEVEL_ERROR = zorva::util::kLevelError,
 };
 
 // A longer line is truncated.

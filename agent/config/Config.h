@@ -5,6 +5,7 @@
 #include <string>
 
 #include "agent/interface/AgentApi.h"
+#include "util/LogLevels.h"
 
 namespace zorva::agent {
 
@@ -46,9 +47,9 @@ struct Config {
   bool includeLoopback = false;
 
   // [log]
-  int logLevel = 6000;  // lines below it are dropped
+  int logLevel = util::kLevelError;  // lines below it are dropped
   std::string logTarget = "stderr";
-  int traceLevel = 6000;
+  int traceLevel = util::kLevelError;
   std::string traceTarget = "off";
 };
 

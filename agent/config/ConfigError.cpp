@@ -1,19 +1,19 @@
 #include "agent/config/Config.h"
-#include "agent/log/Escape.h"
+#include "util/Escape.h"
 
 namespace zorva::agent {
 namespace {
 
 std::string oneLine(const std::string& file, int line, const std::string& key, const std::string& problem) {
   std::string text;
-  if (!file.empty()) appendEscaped(text, file);
+  if (!file.empty()) util::appendEscaped(text, file);
   if (line > 0) text += ':' + std::to_string(line);
   if (!text.empty()) text += ": ";
   if (!key.empty()) {
-    appendEscaped(text, key);
+    util::appendEscaped(text, key);
     text += ": ";
   }
-  appendEscaped(text, problem);
+  util::appendEscaped(text, problem);
   return text;
 }
 

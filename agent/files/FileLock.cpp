@@ -8,7 +8,7 @@
 #include <thread>
 #include <utility>
 
-#include "agent/files/FileError.h"
+#include "util/FileError.h"
 
 namespace zorva::agent {
 namespace {
@@ -17,27 +17,27 @@ constexpr mode_t kLockMode = 0600;
 constexpr std::chrono::seconds kLongestWait{10};
 constexpr std::chrono::microseconds kPause{500};
 
-FileDescriptor opened(const std::string& path) {
-  FileDescriptor file = openLockFile(path, kLockMode);
-  if (!file) throwFileError(path, "cannot be opened");
+util::FileDescriptor opened(const std::string& path) {
+  util::FileDescriptor file = openLockFile(path, kLockMode);
+  if (!file) util::throwFileError(path, "cannot be opened");
   return file;
 }
 
 }  // namespace
 
-FileDescriptor openLockFile(const std::string& path, mode_t rights) {
-  return FileDescriptor(::open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK, rights));
+util::FileDescriptor openLockFile(const std::string& path, mode_t rights) {
+  return util::FileDescriptor(::open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK, rights));
 }
 
 FileLock::Deadline FileLock::usualDeadline() { return std::chrono::steady_clock::now() + kLongestWait; }
 
 FileLock::FileLock(const std::string& path) : FileLock(opened(path), path, Mode::Exclusive, usualDeadline()) {}
 
-FileLock::FileLock(FileDescriptor file, const std::string& path, Mode mode, Deadline deadline)
+FileLock::FileLock(util::FileDescriptor file, const std::string& path, Mode mode, Deadline deadline)
     : file_(std::move(file)) {
   const int operation = (mode == Mode::Exclusive ? LOCK_EX : LOCK_SH) | LOCK_NB;
   while (::flock(file_.get(), operation) != 0) {
-    if (errno != EWOULDBLOCK && errno != EINTR) throwFileError(path, "cannot be locked");
+    if (errno != EWOULDBLOCK && errno != EINTR) util::throwFileError(path, "cannot be locked");
     if (std::chrono::steady_clock::now() > deadline) {
       throw std::runtime_error(path + ": another process has held the lock for ten seconds");
     }

@@ -6,7 +6,7 @@
 #include <chrono>
 #include <string>
 
-#include "agent/files/FileDescriptor.h"
+#include "util/FileDescriptor.h"
 
 namespace zorva::agent {
 
@@ -25,7 +25,7 @@ class FileLock {
   explicit FileLock(const std::string& path);
 
   // Locks a file that is open. An exclusive lock may need one that is open for writing.
-  FileLock(FileDescriptor file, const std::string& path, Mode mode, Deadline deadline);
+  FileLock(util::FileDescriptor file, const std::string& path, Mode mode, Deadline deadline);
 
   ~FileLock();
   FileLock(const FileLock&) = delete;
@@ -34,10 +34,10 @@ class FileLock {
   int descriptor() const { return file_.get(); }
 
  private:
-  FileDescriptor file_;
+  util::FileDescriptor file_;
 };
 
 // Opens a lock's file for reading and writing, or makes it with these rights. errno says why there is none.
-FileDescriptor openLockFile(const std::string& path, mode_t rights);
+util::FileDescriptor openLockFile(const std::string& path, mode_t rights);
 
 }  // namespace zorva::agent

@@ -95,7 +95,7 @@ bool FileWatch::differs(const State& before) const {
 void FileWatch::startInotify(const std::vector<std::string>& paths) {
   const std::vector<Place> old = std::exchange(places_, {});
   blind_ = false;
-  if (!inotify_) inotify_ = FileDescriptor(::inotify_init1(IN_NONBLOCK | IN_CLOEXEC));
+  if (!inotify_) inotify_ = util::FileDescriptor(::inotify_init1(IN_NONBLOCK | IN_CLOEXEC));
   if (!inotify_) {
     blind_ = true;
     return;

@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "agent/files/FileDescriptor.h"
+#include "util/FileDescriptor.h"
 
 namespace zorva::agent {
 
@@ -62,7 +62,7 @@ class FileWatch {
   bool watching_ = false;      // watch has been called
   std::vector<State> states_;  // while it compares
 
-  FileDescriptor inotify_;  // kept once it is open: to close it takes long
+  util::FileDescriptor inotify_;  // kept once it is open: to close it takes long
   std::vector<Place> places_;
   bool blind_ = false;  // something cannot be watched
 };

@@ -3,8 +3,8 @@
 #include <string_view>
 
 #include "agent/files/Lines.h"
-#include "agent/files/ReadFile.h"
 #include "agent/interface/StringConversion.h"
+#include "util/ReadFile.h"
 
 namespace ZV {
 namespace {
@@ -20,7 +20,7 @@ PropertyFile::~PropertyFile() = default;
 
 bool PropertyFile::open(unsigned long) {
   entries_.clear();
-  const zorva::agent::FileText file = zorva::agent::readFile(path_, kLargestFile);
+  const zorva::util::FileText file = zorva::util::readFile(path_, kLargestFile);
   if (file.error != 0 || file.truncated) return false;
   for (std::string_view rest = file.text; !rest.empty();) {
     const std::string_view line = zorva::agent::takeLine(rest);

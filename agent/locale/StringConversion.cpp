@@ -1,6 +1,9 @@
 #include "agent/interface/StringConversion.h"
 
-#include "agent/locale/Utf8.h"
+#include <string_view>
+
+#include "util/Text.h"
+#include "util/Utf8.h"
 
 namespace ZV {
 namespace {
@@ -20,10 +23,11 @@ std::wstring make_wstring(const std::string& text) {
   std::wstring wide;
   wide.reserve(text.size());
   for (std::size_t place = 0; place < text.size();) {
-    const auto [character, length, valid] = zorva::agent::decodeUtf8(text, place);
+    const std::string_view rest = std::string_view(text).substr(place);
+    const std::size_t length = zorva::util::utf8Length(rest);
     const char32_t byte = kByteBase + static_cast<unsigned char>(text[place]);
-    wide += static_cast<wchar_t>(valid ? character : byte);
-    place += length;
+    wide += static_cast<wchar_t>(length == 0 ? byte : zorva::util::utf8Decode(rest));
+    place += length == 0 ? 1 : length;
   }
   return wide;
 }
@@ -40,16 +44,12 @@ std::string make_string(const std::wstring& text) {
     if (isByte(character)) {
       narrow += static_cast<char>(static_cast<unsigned char>(character - kByteBase));
     } else {
-      zorva::agent::appendUtf8(narrow, isScalar(character) ? character : kReplacement);
+      zorva::util::utf8Append(narrow, isScalar(character) ? character : kReplacement);
     }
   }
   return narrow;
 }
 
-std::string stripSpaces(const std::string& text) {
-  const std::size_t first = text.find_first_not_of(" \t");
-  if (first == std::string::npos) return {};
-  return text.substr(first, text.find_last_not_of(" \t") - first + 1);
-}
+std::string stripSpaces(const std::string& text) { return std::string(zorva::util::trimmed(text)); }
 
 }  // namespace ZV

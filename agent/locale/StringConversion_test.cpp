@@ -2,8 +2,6 @@
 
 #include <gtest/gtest.h>
 
-#include "agent/locale/Utf8.h"
-
 namespace {
 
 using ZV::make_string;

@@ -12,9 +12,9 @@
 #include <stdexcept>
 
 #include "agent/Runtime.h"
-#include "agent/files/FileDescriptor.h"
-#include "agent/files/ReadFile.h"
-#include "agent/log/Escape.h"
+#include "util/Escape.h"
+#include "util/FileDescriptor.h"
+#include "util/ReadFile.h"
 
 #define FMT_HEADER_ONLY
 #define SPDLOG_NO_THREAD_ID
@@ -39,7 +39,7 @@ std::atomic<int>& thresholdOf(LogStream stream) { return stream == LogStream::Lo
 class DescriptorSink : public spdlog::sinks::base_sink<spdlog::details::null_mutex> {
  public:
   explicit DescriptorSink(int borrowed) : descriptor_(borrowed) {}
-  explicit DescriptorSink(FileDescriptor owned) : owned_(std::move(owned)), descriptor_(owned_.get()) {}
+  explicit DescriptorSink(util::FileDescriptor owned) : owned_(std::move(owned)), descriptor_(owned_.get()) {}
 
  protected:
   void sink_it_(const spdlog::details::log_msg& message) override {
@@ -57,19 +57,20 @@ class DescriptorSink : public spdlog::sinks::base_sink<spdlog::details::null_mut
   void flush_() override {}
 
  private:
-  FileDescriptor owned_;
+  util::FileDescriptor owned_;
   int descriptor_;
 };
 
 // Opens a file for appending. A FIFO or a socket would block or end the process some day.
-FileDescriptor openLogFile(const std::string& path) {
+util::FileDescriptor openLogFile(const std::string& path) {
   constexpr mode_t kMode = 0640;
-  FileDescriptor file(::open(path.c_str(), O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC | O_NOCTTY | O_NONBLOCK, kMode));
+  util::FileDescriptor file(
+      ::open(path.c_str(), O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC | O_NOCTTY | O_NONBLOCK, kMode));
   struct stat status {};
   const int error = !file || ::fstat(file.get(), &status) != 0           ? errno
                     : S_ISREG(status.st_mode) || S_ISCHR(status.st_mode) ? 0
                                                                          : EINVAL;
-  if (error != 0) throw std::runtime_error(path + ": cannot be opened as a log: " + fileErrorText(error));
+  if (error != 0) throw std::runtime_error(path + ": cannot be opened as a log: " + util::fileErrorText(error));
   return file;
 }
 
@@ -95,19 +96,18 @@ Logger makeLogger(const std::string& target) {
 
 // What syslog is to make of a level.
 spdlog::level::level_enum severity(int level) {
-  constexpr int kDetail = 4000;
-  if (level >= kLevelError) return spdlog::level::err;
-  return level >= kDetail ? spdlog::level::info : spdlog::level::debug;
+  if (level >= util::kLevelError) return spdlog::level::err;
+  return level >= util::kLevelDetail ? spdlog::level::info : spdlog::level::debug;
 }
 
 void appendText(std::string& line, const char* text) {
-  if (text != nullptr) appendEscaped(line, text);
+  if (text != nullptr) util::appendEscaped(line, text);
 }
 
 std::string composeLine(const LogCall& call) {
   std::string line = std::to_string(call.level);
   line += ' ';
-  appendEscaped(line, call.category);
+  util::appendEscaped(line, call.category);
   line += ' ';
   appendText(line, call.function);
   line += ' ';
@@ -115,7 +115,7 @@ std::string composeLine(const LogCall& call) {
   line += ':';
   line += std::to_string(call.line);
   line += ' ';
-  appendEscaped(line, call.message);
+  util::appendEscaped(line, call.message);
   return line;
 }
 

@@ -5,6 +5,7 @@
 #include <string>
 
 #include "agent/log/LogSink.h"
+#include "util/LogLevels.h"
 
 namespace zorva::agent {
 
@@ -24,10 +25,8 @@ void writeLine(const LogCall& call) noexcept;
 // Writes a line of the agent's own to the log, under the category "Zorvagent.Agent". Never throws.
 void logOwn(int level, const char* function, const char* file, int line, const std::string& message) noexcept;
 
-inline constexpr int kLevelError = 6000;
-
 #define ZORVAGENT_LOG_ERROR(message) \
-  zorva::agent::logOwn(zorva::agent::kLevelError, static_cast<const char*>(__func__), __FILE__, __LINE__, (message))
+  zorva::agent::logOwn(zorva::util::kLevelError, static_cast<const char*>(__func__), __FILE__, __LINE__, (message))
 
 // Change a stream at run time. The target is "stderr", "syslog", "off" or the path of a file that is appended to;
 // std::runtime_error, with the reason, where that cannot be opened, and the target stays.

@@ -1,14 +1,15 @@
 #include "agent/sources/HostSource.h"
 
 #include <linux/if.h>
-#include <sys/utsname.h>
 
 #include <algorithm>
 #include <unordered_map>
 #include <unordered_set>
 #include <utility>
 
-#include "agent/files/ReadFile.h"
+#include "util/HostName.h"
+#include "util/ReadFile.h"
+#include "util/Text.h"
 
 namespace zorva::agent {
 namespace {
@@ -28,11 +29,6 @@ constexpr unsigned int kOther = 1;
 constexpr unsigned int kIPv4 = 4096;
 constexpr unsigned int kIPv6 = 4097;
 constexpr unsigned int kBoth = 4098;
-
-std::string kernelNodeName() {
-  utsname name{};
-  return ::uname(&name) == 0 ? name.nodename : "";
-}
 
 unsigned int enabledState(const Link& link) {
   if ((link.flags & IFF_UP) == 0) return kDown;
@@ -77,7 +73,7 @@ bool HostSource::changed() {
   if (!watching_) return true;
   const bool linksChanged = monitor_.changed();
   if (watch_.changed()) filesMoved_ = true;
-  return linksChanged || filesMoved_ || unread_ || kernelNodeName() != nodeName_;
+  return linksChanged || filesMoved_ || unread_ || util::kernelHostName() != nodeName_;
 }
 
 void HostSource::reopen() {
@@ -97,7 +93,7 @@ void HostSource::startWatching() {
 std::shared_ptr<const TreeSnapshot> HostSource::read() {
   startWatching();
   unread_ = false;
-  nodeName_ = kernelNodeName();
+  nodeName_ = util::kernelHostName();
   const Resolver resolver = readResolver();
   LinkTable table = reader_.read();
   AddressesOfLinks addresses = addressesByLink(table);
@@ -127,10 +123,10 @@ std::shared_ptr<const TreeSnapshot> HostSource::read() {
 }
 
 // A line that the limit cuts is left out.
-FileText HostSource::readLines(const std::string& path) {
-  FileText file = readFile(path, kLargestFile);
+util::FileText HostSource::readLines(const std::string& path) {
+  util::FileText file = util::readFile(path, kLargestFile);
   if (file.truncated) file.text.erase(file.text.rfind('\n') + 1);
-  if (mayPass(file.error)) unread_ = true;
+  if (util::mayPass(file.error)) unread_ = true;
   return file;
 }
 
@@ -139,7 +135,7 @@ std::string HostSource::linesOf(const std::string& path) { return readLines(path
 
 HostSource::Resolver HostSource::readResolver() {
   Resolver result;
-  const FileText file = readLines(resolvConf_);
+  const util::FileText file = readLines(resolvConf_);
   ResolvConf conf;
   if (file.error == 0) {
     conf = parseResolvConf(file.text);
@@ -159,11 +155,9 @@ HostSource::Resolver HostSource::readResolver() {
 // What the machine is called by its maker, where the firmware tells. It stays the same while the machine runs.
 std::string HostSource::product() {
   if (!product_.empty()) return product_;
-  const FileText file = readLines(options_.root + "/sys/class/dmi/id/product_name");
-  if (mayPass(file.error)) return kComputer;
-  std::string name = file.text;
-  const std::size_t end = name.find_last_not_of(" \t\r\n");
-  name.erase(end == std::string::npos ? 0 : end + 1);
+  const util::FileText file = readLines(options_.root + "/sys/class/dmi/id/product_name");
+  if (util::mayPass(file.error)) return kComputer;
+  const std::string name(util::trimmedEnd(file.text, util::kWhiteSpace));
   // "BMC" is what tells a service processor, and this is none.
   product_ = name.empty() || name == "BMC" ? kComputer : name;
   return product_;

@@ -4,10 +4,10 @@
 #include <string>
 
 #include "agent/files/FileWatch.h"
-#include "agent/files/ReadFile.h"
 #include "agent/sources/HostNames.h"
 #include "agent/sources/Netlink.h"
 #include "agent/tree/TreeSource.h"
+#include "util/ReadFile.h"
 
 namespace zorva::agent {
 
@@ -43,7 +43,7 @@ class HostSource : public TreeSource {
   };
 
   void startWatching();
-  FileText readLines(const std::string& path);
+  util::FileText readLines(const std::string& path);
   std::string linesOf(const std::string& path);
   Resolver readResolver();
   std::string product();

@@ -6,8 +6,8 @@
 #include <nlohmann/json.hpp>
 #include <utility>
 
-#include "agent/files/ReadFile.h"
-#include "agent/locale/Utf8.h"
+#include "util/ReadFile.h"
+#include "util/Utf8.h"
 
 namespace zorva::agent {
 namespace {
@@ -16,16 +16,18 @@ constexpr char32_t kByteBase = 0x10EE00;
 
 bool isByte(char32_t character) { return character >= kByteBase + 0x80 && character <= kByteBase + 0xFF; }
 
+// A byte that is no UTF-8 becomes a character of its own, and so do the bytes of such a character.
 std::string bytesToJson(std::string_view bytes) {
   std::string text;
   text.reserve(bytes.size());
-  for (std::size_t place = 0; place < bytes.size();) {
-    const auto [character, length, valid] = decodeUtf8(bytes, place);
-    if (valid && !isByte(character)) {
-      text += bytes.substr(place, length);
-      place += length;
+  while (!bytes.empty()) {
+    const std::size_t length = util::utf8Length(bytes);
+    if (length != 0 && !isByte(util::utf8Decode(bytes))) {
+      text += bytes.substr(0, length);
+      bytes.remove_prefix(length);
     } else {
-      appendUtf8(text, kByteBase + static_cast<unsigned char>(bytes[place++]));
+      util::utf8Append(text, kByteBase + static_cast<unsigned char>(bytes.front()));
+      bytes.remove_prefix(1);
     }
   }
   return text;
@@ -34,14 +36,14 @@ std::string bytesToJson(std::string_view bytes) {
 std::string jsonToBytes(std::string_view text) {
   std::string bytes;
   bytes.reserve(text.size());
-  for (std::size_t place = 0; place < text.size();) {
-    const auto [character, length, valid] = decodeUtf8(text, place);
-    if (valid && isByte(character)) {
-      bytes += static_cast<char>(static_cast<unsigned char>(character - kByteBase));
+  while (!text.empty()) {
+    const std::size_t length = util::utf8Length(text);
+    if (length != 0 && isByte(util::utf8Decode(text))) {
+      bytes += static_cast<char>(static_cast<unsigned char>(util::utf8Decode(text) - kByteBase));
     } else {
-      bytes += text.substr(place, length);
+      bytes += text.substr(0, length == 0 ? 1 : length);
     }
-    place += length;
+    text.remove_prefix(length == 0 ? 1 : length);
   }
   return bytes;
 }
@@ -281,8 +283,8 @@ JsonValue parseJson(const std::string& text, const std::string& name) {
 }
 
 JsonValue readJsonFile(const std::string& path) {
-  const FileText file = readFile(path, kLargestJson);
-  if (file.error != 0) throw ConfigError(path, 0, {}, "cannot be read: " + fileErrorText(file.error));
+  const util::FileText file = util::readFile(path, kLargestJson);
+  if (file.error != 0) throw ConfigError(path, 0, {}, "cannot be read: " + util::fileErrorText(file.error));
   if (file.truncated) throw ConfigError(path, 0, {}, "is larger than 64 MiB");
   return parseJson(file.text, path);
 }

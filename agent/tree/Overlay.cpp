@@ -7,10 +7,10 @@
 #include <utility>
 
 #include "agent/files/FileLock.h"
-#include "agent/files/ReadFile.h"
-#include "agent/files/ReplaceFile.h"
 #include "agent/log/LogOutput.h"
 #include "agent/tree/TreeJson.h"
+#include "util/ReadFile.h"
+#include "util/ReplaceFile.h"
 
 namespace zorva::agent {
 namespace {
@@ -80,11 +80,11 @@ bool canBeSet(PropertyNumber property, const PropertyValue& value) {
 Overlay::Overlay(const std::string& dataDir) : directory_(dataDir), file_(dataDir + kFileName) {}
 
 OverlayValues Overlay::read() const {
-  const FileText file = readFile(file_, kLargestJson);
+  const util::FileText file = util::readFile(file_, kLargestJson);
   if (file.error == ENOENT) return {};
   if (file.error != 0) {
-    const std::string problem = "cannot be read: " + fileErrorText(file.error);
-    if (mayPass(file.error)) throw OverlayUnreadable(file_, 0, {}, problem);
+    const std::string problem = "cannot be read: " + util::fileErrorText(file.error);
+    if (util::mayPass(file.error)) throw OverlayUnreadable(file_, 0, {}, problem);
     throw ConfigError(file_, 0, {}, problem);
   }
   if (file.truncated) throw ConfigError(file_, 0, {}, "is larger than 64 MiB");
@@ -137,7 +137,8 @@ std::size_t Overlay::clearAll() const {
 void Overlay::write(const OverlayValues& values) const {
   const std::string text = formatJson(valuesToJson(values));
   if (text.size() > kLargestJson) throw std::runtime_error(file_ + ": would become larger than 64 MiB");
-  replaceFile(directory_, kFileName, text);
+  const std::string unsynced = util::replaceFile(directory_, kFileName, text);
+  if (!unsynced.empty()) ZORVAGENT_LOG_ERROR(unsynced);
 }
 
 void OverlayReader::read() {

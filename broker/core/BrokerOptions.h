@@ -8,12 +8,19 @@
 
 #include "broker/core/ProviderRegistry.h"
 #include "broker/objects/Value.h"
+#include "util/LogLevels.h"
 
 // The options of a broker: its registry, and its owner's hooks for log lines and claims.
 
 namespace zorva::broker {
 
-enum class LogLevel { Debug, Info, Warning, Error };
+/// On the scale of the agent's levels.
+enum class LogLevel : int {
+  Debug = util::kLevelFlow,
+  Info = util::kLevelDetail,
+  Warning = util::kLevelWarning,
+  Error = util::kLevelError,
+};
 
 /// Takes one log line of the broker, or of a provider that logs through the broker.
 using LogHook = std::function<void(LogLevel level, std::string_view text)>;

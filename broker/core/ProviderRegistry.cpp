@@ -5,8 +5,8 @@
 #include <system_error>
 #include <utility>
 
-#include "schema/Names.h"
 #include "schema/Schema.h"
+#include "util/Names.h"
 
 namespace zorva::broker {
 
@@ -83,7 +83,7 @@ void ProviderRegistry::add(ProviderEntry entry) {
   addNameSpace(entry.nameSpace);
   entry.nameSpace = nameSpace(entry.nameSpace);
   const auto same = std::find_if(entries_.begin(), entries_.end(), [&entry](const ProviderEntry& other) {
-    return schema::sameName(other.className, entry.className) && other.nameSpace == entry.nameSpace;
+    return util::sameName(other.className, entry.className) && other.nameSpace == entry.nameSpace;
   });
   if (same != entries_.end()) {
     *same = std::move(entry);
@@ -94,7 +94,7 @@ void ProviderRegistry::add(ProviderEntry entry) {
 
 const ProviderEntry* ProviderRegistry::find(std::string_view nameSpace, std::string_view className) const noexcept {
   const auto found = std::find_if(entries_.begin(), entries_.end(), [&](const ProviderEntry& entry) {
-    return schema::sameName(entry.className, className) && schema::sameNamespace(entry.nameSpace, nameSpace);
+    return util::sameName(entry.className, className) && schema::sameNamespace(entry.nameSpace, nameSpace);
   });
   return found != entries_.end() ? &*found : nullptr;
 }

@@ -51,7 +51,7 @@ const PropertyInfo* ClassInfo::find(std::string_view name) const noexcept {
   for (std::size_t bucket = bucketOf(name, mask); buckets_[bucket] != 0; bucket = (bucket + 1) & mask) {
     const PropertyInfo& property = properties_[buckets_[bucket] - 1U];
     const std::string_view known = property.name->view();
-    if (known == name || schema::sameName(known, name)) return &property;
+    if (known == name || util::sameName(known, name)) return &property;
   }
   return nullptr;
 }
@@ -89,7 +89,7 @@ const ClassInfo* findClass(Arena& arena, std::string_view name) {
   if (arena.isShared()) return arena.classes()->find(name);
   RecentNames& recent = arena.recent();
   for (const ClassInfo* known : recent.classes) {
-    if (known != nullptr && schema::sameName(known->name(), name)) return known;
+    if (known != nullptr && util::sameName(known->name(), name)) return known;
   }
   const ClassInfo* found = arena.classes()->find(name);
   if (found != nullptr) recent.classes[recent.nextClass++ % RecentNames::kRemembered] = found;

@@ -78,8 +78,7 @@ class ClassTable {
  private:
   const std::shared_ptr<const schema::ClassRepository> repository_;
   mutable std::shared_mutex mutex_;
-  mutable std::unordered_map<std::string_view, std::unique_ptr<ClassInfo>, schema::NameHash, schema::NameEqual>
-      classes_;
+  mutable std::unordered_map<std::string_view, std::unique_ptr<ClassInfo>, util::NameHash, util::NameEqual> classes_;
 };
 
 /// The class of that name in the class table of `arena`, or null. Recently used classes are found fastest.

@@ -288,8 +288,7 @@ class ScalarMaker {
   /// A text given for a number, a boolean or a character.
   std::string untyped(const std::string& text) {
     if (data_.type == CMPI_boolean) {
-      if (schema::sameName(text, "true") || schema::sameName(text, "false"))
-        return (*this)(schema::sameName(text, "true"));
+      if (util::sameName(text, "true") || util::sameName(text, "false")) return (*this)(util::sameName(text, "true"));
       return mismatch(quotedText(text));
     }
     if (data_.type == CMPI_char16) {

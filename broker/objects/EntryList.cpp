@@ -1,13 +1,13 @@
 #include <algorithm>
 
 #include "broker/objects/Objects.h"
-#include "schema/Names.h"
+#include "util/Names.h"
 
 namespace zorva::broker {
 
 const EntryList::Entry* EntryList::find(std::string_view name) const noexcept {
   const Entry* found =
-      std::find_if(begin(), end(), [name](const Entry& entry) { return schema::sameName(entry.name->view(), name); });
+      std::find_if(begin(), end(), [name](const Entry& entry) { return util::sameName(entry.name->view(), name); });
   return found != end() ? found : nullptr;
 }
 

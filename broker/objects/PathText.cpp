@@ -4,7 +4,8 @@
 #include <charconv>
 #include <system_error>
 
-#include "schema/Names.h"
+#include "util/Names.h"
+#include "util/Utf8.h"
 
 namespace zorva::broker {
 
@@ -21,19 +22,6 @@ int hexDigit(char c) noexcept {
   if (c >= 'a' && c <= 'f') return c - 'a' + 10;
   if (c >= 'A' && c <= 'F') return c - 'A' + 10;
   return -1;
-}
-
-void appendUtf8(std::string& text, unsigned code) {
-  if (code < 0x80) {
-    text += static_cast<char>(code);
-  } else if (code < 0x800) {
-    text += static_cast<char>(0xC0 | (code >> 6));
-    text += static_cast<char>(0x80 | (code & 0x3F));
-  } else {
-    text += static_cast<char>(0xE0 | (code >> 12));
-    text += static_cast<char>(0x80 | ((code >> 6) & 0x3F));
-    text += static_cast<char>(0x80 | (code & 0x3F));
-  }
 }
 
 class Reader {
@@ -180,7 +168,7 @@ class Reader {
     }
     if (digits == 0) return expected("one to four hexadecimal digits after \\x");
     if (code == 0 || (code >= 0xD800 && code <= 0xDFFF)) return failAt(start, "this \\x names no character");
-    appendUtf8(text, code);
+    util::utf8Append(text, code);
     return true;
   }
 
@@ -188,8 +176,8 @@ class Reader {
     const std::size_t start = position_;
     while (!atEnd() && continuesName(peek())) ++position_;
     const std::string_view word = text_.substr(start, position_ - start);
-    if (schema::sameName(word, "true") || schema::sameName(word, "false")) {
-      value = Value::boolean(schema::sameName(word, "true"));
+    if (util::sameName(word, "true") || util::sameName(word, "false")) {
+      value = Value::boolean(util::sameName(word, "true"));
       return true;
     }
     position_ = start;
@@ -256,7 +244,7 @@ struct ScalarText {
   std::string operator()(double number) const { return realText(number); }
   std::string operator()(char16_t code) const {
     std::string text;
-    appendUtf8(text, code);
+    util::utf8Append(text, code);
     return quotedText(text);
   }
   std::string operator()(const std::string& text) const { return quotedText(text); }

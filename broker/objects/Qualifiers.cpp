@@ -76,7 +76,7 @@ const schema::Qualifiers* parameterQualifiers(const PathObject& path, const char
   const schema::ClassMethod* owner = findMethod(path, method);
   if (owner == nullptr || parameter == nullptr) return nullptr;
   const auto found = std::find_if(owner->parameters.begin(), owner->parameters.end(),
-                                  [&](const auto& candidate) { return schema::sameName(candidate.name, parameter); });
+                                  [&](const auto& candidate) { return util::sameName(candidate.name, parameter); });
   return found != owner->parameters.end() ? &found->qualifiers : nullptr;
 }
 

@@ -52,8 +52,8 @@ std::string_view Value::asText() const noexcept {
 }
 
 const Value* ObjectPath::key(std::string_view name) const noexcept {
-  const auto found = std::find_if(keys.begin(), keys.end(),
-                                  [name](const NamedValue& key) { return schema::sameName(key.name, name); });
+  const auto found =
+      std::find_if(keys.begin(), keys.end(), [name](const NamedValue& key) { return util::sameName(key.name, name); });
   return found != keys.end() ? &found->value : nullptr;
 }
 
@@ -87,7 +87,7 @@ bool hasSameEffect(const Value& a, const Value& b) {
 
 const Value* Instance::property(std::string_view name) const noexcept {
   const auto found = std::find_if(properties.begin(), properties.end(),
-                                  [name](const Property& property) { return schema::sameName(property.name, name); });
+                                  [name](const Property& property) { return util::sameName(property.name, name); });
   return found != properties.end() ? &found->value : nullptr;
 }
 

@@ -5,8 +5,8 @@
 #include <string_view>
 
 #include "cmpidt.h"
-#include "schema/Names.h"
-#include "schema/Utf8.h"
+#include "util/Names.h"
+#include "util/Utf8.h"
 
 namespace zorva::broker {
 
@@ -20,9 +20,9 @@ std::optional<std::uint32_t> findIn(const Scalar& scalar);
 
 std::optional<std::uint32_t> findIn(std::string_view text) {
   while (!text.empty()) {
-    const std::size_t length = schema::utf8Length(text);
+    const std::size_t length = util::utf8Length(text);
     // Invalid UTF-8 is refused elsewhere.
-    const std::uint32_t code = length == 0 ? ' ' : schema::utf8Decode(text);
+    const std::uint32_t code = length == 0 ? ' ' : util::utf8Decode(text);
     if (isRefused(code)) return code;
     text.remove_prefix(std::max<std::size_t>(length, 1));
   }
@@ -66,7 +66,7 @@ Status refusal(const char* what, const std::string& name, std::uint32_t code) {
 Status refuseControlCharacters(const Instance& instance, const std::optional<std::vector<std::string>>& propertyList) {
   const auto isListed = [&](const std::string& name) {
     return !propertyList || std::any_of(propertyList->begin(), propertyList->end(),
-                                        [&](const std::string& one) { return schema::sameName(one, name); });
+                                        [&](const std::string& one) { return util::sameName(one, name); });
   };
   for (const Property& property : instance.properties) {
     const auto found = findIn(property.value);

@@ -7,7 +7,7 @@
 #include "broker/objects/Convert.h"
 #include "broker/objects/Data.h"
 #include "broker/objects/PathText.h"
-#include "schema/Names.h"
+#include "util/Names.h"
 
 namespace zorva::broker {
 
@@ -57,7 +57,7 @@ Status checkKeys(const ModificationRequest& request) {
 bool isListed(const Shape& shape, const PropertyInfo& property) {
   if (!shape.properties) return true;
   return std::any_of(shape.properties->begin(), shape.properties->end(),
-                     [&](std::string_view name) { return schema::sameName(name, property.name->view()); });
+                     [&](std::string_view name) { return util::sameName(name, property.name->view()); });
 }
 
 /// The value that the client names for the property, if it is not the current one; else null.
@@ -70,7 +70,7 @@ const CMPIData* newValue(const ModificationRequest& request, const PropertyInfo&
 
 bool isKept(const ProviderEntry& provider, const PropertyInfo& property) {
   return std::any_of(provider.keeps.begin(), provider.keeps.end(),
-                     [&](const std::string& name) { return schema::sameName(name, property.name->view()); });
+                     [&](const std::string& name) { return util::sameName(name, property.name->view()); });
 }
 
 void handOver(const ModificationRequest& request, const PropertyInfo& property, Modification& modification) {

@@ -377,7 +377,7 @@ bool canBeOf(const schema::ClassProperty& end, const schema::Class& wanted) {
 }
 
 bool named(const schema::ClassProperty& end, std::string_view role) {
-  return role.empty() || schema::sameName(end.name, role);
+  return role.empty() || util::sameName(end.name, role);
 }
 
 /// The first pair of ends that fits; without a far end if the filter does not restrict it.
@@ -521,7 +521,7 @@ Status checkedArguments(const schema::ClassMethod& method, const EntryList& inpu
   for (const EntryList::Entry& entry : input) {
     const auto parameter = std::find_if(
         method.parameters.begin(), method.parameters.end(),
-        [&entry](const schema::Parameter& candidate) { return schema::sameName(candidate.name, entry.name->view()); });
+        [&entry](const schema::Parameter& candidate) { return util::sameName(candidate.name, entry.name->view()); });
     if (parameter == method.parameters.end()) {
       return failure(CMPI_RC_ERR_INVALID_PARAMETER, method.name + " has no parameter " + quoted(entry.name->view()));
     }

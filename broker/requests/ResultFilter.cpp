@@ -71,7 +71,7 @@ bool ResultFilter::includes(const PropertyInfo& property) const {
   if (requested_ != nullptr && !shape_.deepInheritance && requested_->find(name) == nullptr) return false;
   if (!shape_.properties) return true;
   return std::any_of(shape_.properties->begin(), shape_.properties->end(),
-                     [&name](std::string_view listed) { return schema::sameName(listed, name); });
+                     [&name](std::string_view listed) { return util::sameName(listed, name); });
 }
 
 PropertyMask ResultFilter::maskOf(const ClassInfo& info) {

@@ -9,7 +9,7 @@
 #include "cimxml/ElementWriter.h"
 #include "cimxml/XmlText.h"
 #include "cimxml/testing/Grammar.h"
-#include "schema/Names.h"
+#include "util/Names.h"
 
 namespace zorva::cimom::testing {
 
@@ -35,7 +35,7 @@ void CollectingSink::fail(std::uint32_t cimStatus, std::string_view description)
 
 std::string CollectingSink::header(std::string_view name) const {
   for (const auto& [known, value] : headers) {
-    if (schema::sameName(known, name)) return value;
+    if (util::sameName(known, name)) return value;
   }
   return {};
 }

@@ -4,7 +4,7 @@
 #include <cstddef>
 #include <string>
 
-namespace zorva::agent {
+namespace zorva::util {
 
 struct FileText {
   std::string text;        // what was read, at most the limit
@@ -23,4 +23,4 @@ bool mayPass(int error);
 // What an error number of FileText means, in words.
 std::string fileErrorText(int error);
 
-}  // namespace zorva::agent
+}  // namespace zorva::util

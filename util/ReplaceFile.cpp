@@ -1,35 +1,22 @@
-#include "agent/files/ReplaceFile.h"
+#include "util/ReplaceFile.h"
 
 #include <fcntl.h>
 #include <unistd.h>
 
 #include <cerrno>
-#include <string_view>
 #include <system_error>
+#include <utility>
 
-#include "agent/files/FileDescriptor.h"
-#include "agent/files/FileError.h"
-#include "agent/log/LogOutput.h"
+#include "util/FileError.h"
 
-namespace zorva::agent {
+namespace zorva::util {
 namespace {
 
 constexpr mode_t kFileMode = 0644;
 
-void writeAll(const FileDescriptor& file, std::string_view text, const std::string& path) {
-  while (!text.empty()) {
-    const ssize_t written = ::write(file.get(), text.data(), text.size());
-    if (written < 0 && errno == EINTR) continue;
-    if (written < 0) throwFileError(path, "cannot be written");
-    text.remove_prefix(static_cast<std::size_t>(written));
-  }
-}
-
-// A directory entry is on the disk when its directory is. The new file is in its place by now either way.
-void syncDirectory(const std::string& directory) {
-  const FileDescriptor folder(::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-  if (folder && ::fsync(folder.get()) == 0) return;
-  ZORVAGENT_LOG_ERROR(directory + ": cannot be synced: " + std::generic_category().message(errno));
+void writeAndSync(const FileDescriptor& file, std::string_view text, const std::string& path) {
+  if (!writeAll(file, text)) throwFileError(path, "cannot be written");
+  if (::fsync(file.get()) != 0) throwFileError(path, "cannot be synced");
 }
 
 // Removes the temporary file where the way is left early.
@@ -57,8 +44,8 @@ void giveRights(const FileDescriptor& file, const struct stat& like) {
 
 }  // namespace
 
-void replaceFile(const std::string& directory, const std::string& name, const std::string& text,
-                 const struct stat* like) {
+std::string replaceFile(const std::string& directory, const std::string& name, const std::string& text,
+                        const struct stat* like) {
   const std::string target = directory + name;
   TemporaryFile temporary(target + ".new");
   {
@@ -66,19 +53,33 @@ void replaceFile(const std::string& directory, const std::string& name, const st
                                      like == nullptr ? kFileMode : S_IRUSR | S_IWUSR));
     if (!file) throwFileError(temporary.path(), "cannot be opened");
     if (like != nullptr) giveRights(file, *like);
-    writeAll(file, text, temporary.path());
-    if (::fsync(file.get()) != 0) throwFileError(temporary.path(), "cannot be synced");
+    writeAndSync(file, text, temporary.path());
   }
   if (::rename(temporary.path().c_str(), target.c_str()) != 0) throwFileError(target, "cannot be replaced");
   temporary.keep();
-  syncDirectory(directory);
+  if (syncDirectory(directory)) return {};
+  return directory + ": cannot be synced: " + std::generic_category().message(errno);
 }
 
 void overwriteFile(const std::string& path, const std::string& text) {
   const FileDescriptor file(::open(path.c_str(), O_WRONLY | O_TRUNC | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
   if (!file) throwFileError(path, "cannot be opened");
-  writeAll(file, text, path);
-  if (::fsync(file.get()) != 0) throwFileError(path, "cannot be synced");
+  writeAndSync(file, text, path);
+}
+
+bool writeAll(const FileDescriptor& file, std::string_view text) {
+  while (!text.empty()) {
+    const ssize_t written = ::write(file.get(), text.data(), text.size());
+    if (written < 0 && errno == EINTR) continue;
+    if (written < 0) return false;
+    text.remove_prefix(static_cast<std::size_t>(written));
+  }
+  return true;
+}
+
+bool syncDirectory(const std::string& directory) {
+  const FileDescriptor folder(::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+  return folder && ::fsync(folder.get()) == 0;
 }
 
 bool syncFile(const std::string& path) {
@@ -86,4 +87,4 @@ bool syncFile(const std::string& path) {
   return file && ::fsync(file.get()) == 0;
 }
 
-}  // namespace zorva::agent
+}  // namespace zorva::util

@@ -5,7 +5,7 @@
 
 #include <utility>
 
-namespace zorva::agent {
+namespace zorva::util {
 
 // Closes the descriptor at its end; -1 is none.
 class FileDescriptor {
@@ -21,12 +21,14 @@ class FileDescriptor {
 
   explicit operator bool() const { return descriptor_ >= 0; }
   int get() const { return descriptor_; }
+  // Gives the descriptor away.
+  int release() { return std::exchange(descriptor_, -1); }
   void reset() {
-    if (descriptor_ >= 0) ::close(std::exchange(descriptor_, -1));
+    if (descriptor_ >= 0) ::close(release());
   }
 
  private:
   int descriptor_ = -1;
 };
 
-}  // namespace zorva::agent
+}  // namespace zorva::util

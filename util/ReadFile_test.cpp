@@ -1,4 +1,4 @@
-#include "agent/files/ReadFile.h"
+#include "util/ReadFile.h"
 
 #include <gtest/gtest.h>
 
@@ -6,10 +6,10 @@
 
 #include "agent/testing/TemporaryDirectory.h"
 
-namespace zorva::agent {
+namespace zorva::util {
 namespace {
 
-using testing::TemporaryDirectory;
+using zorva::agent::testing::TemporaryDirectory;
 
 constexpr std::size_t kLimit = 10000;
 
@@ -47,4 +47,4 @@ TEST(ReadFile, SaysWhatIsWrong) {
 }
 
 }  // namespace
-}  // namespace zorva::agent
+}  // namespace zorva::util

@@ -1,4 +1,4 @@
-#include "agent/files/ReadFile.h"
+#include "util/ReadFile.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -9,9 +9,9 @@
 #include <cstring>
 #include <system_error>
 
-#include "agent/files/FileDescriptor.h"
+#include "util/FileDescriptor.h"
 
-namespace zorva::agent {
+namespace zorva::util {
 namespace {
 
 constexpr std::size_t kFirstRoom = 4096;
@@ -54,4 +54,4 @@ std::string fileErrorText(int error) {
   return std::generic_category().message(error);
 }
 
-}  // namespace zorva::agent
+}  // namespace zorva::util

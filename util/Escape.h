@@ -4,10 +4,10 @@
 #include <string>
 #include <string_view>
 
-namespace zorva::agent {
+namespace zorva::util {
 
 // Appends a text with whatever could upset a terminal or a reader of lines written out: \n, \r and \t as these, every
 // other control character (C0, DEL and C1) and every byte that is no UTF-8 as \xNN for each of its bytes.
 void appendEscaped(std::string& line, std::string_view text);
 
-}  // namespace zorva::agent
+}  // namespace zorva::util

@@ -1,8 +1,8 @@
-#include "agent/log/Escape.h"
+#include "util/Escape.h"
 
 #include <gtest/gtest.h>
 
-namespace zorva::agent {
+namespace zorva::util {
 namespace {
 
 std::string escaped(std::string_view text) {
@@ -27,4 +27,4 @@ TEST(Escape, ControlCharactersAreWrittenOut) {
 TEST(Escape, BytesThatAreNoUtf8AreWrittenOut) { EXPECT_EQ(escaped("\xFF\x80\xC3"), "\\xff\\x80\\xc3"); }
 
 }  // namespace
-}  // namespace zorva::agent
+}  // namespace zorva::util

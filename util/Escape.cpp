@@ -1,8 +1,8 @@
-#include "agent/log/Escape.h"
+#include "util/Escape.h"
 
-#include "agent/locale/Utf8.h"
+#include "util/Utf8.h"
 
-namespace zorva::agent {
+namespace zorva::util {
 namespace {
 
 bool isPlain(char c) { return c >= 0x20 && c < 0x7F; }
@@ -41,15 +41,15 @@ void appendEscaped(std::string& line, std::string_view text) {
     place = plain;
     if (place == text.size()) return;
 
-    const Utf8Character next = decodeUtf8(text, place);
-    const std::string_view bytes = text.substr(place, next.length);
-    if (next.valid && next.character >= 0xA0) {
+    const std::size_t length = utf8Length(text.substr(place));
+    const std::string_view bytes = text.substr(place, length == 0 ? 1 : length);
+    if (length != 0 && utf8Decode(bytes) >= 0xA0) {
       line += bytes;
     } else {
       appendSpecial(line, bytes);
     }
-    place += next.length;
+    place += bytes.size();
   }
 }
 
-}  // namespace zorva::agent
+}  // namespace zorva::util
