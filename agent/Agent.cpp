@@ -3,6 +3,7 @@
 #include <set>
 
 #include "agent/Runtime.h"
+#include "agent/config/CurrentConfig.h"
 #include "agent/log/LogOutput.h"
 #include "agent/tree/TreeJson.h"
 
@@ -42,8 +43,8 @@ void loadConfig(const std::string& path) {
 void askForExceptions() { Runtime::instance().askForExceptions(); }
 
 const Config& currentConfig() {
-  Runtime::instance().checkConfig();
-  return Runtime::instance().config();
+  CurrentConfig::instance().check();
+  return CurrentConfig::instance().get();
 }
 
 std::shared_ptr<const TreeSnapshot> currentTree() { return Runtime::instance().look(); }
@@ -58,7 +59,7 @@ void setLogLevel(LogStream stream, int level) { setStreamLevel(stream, level); }
 
 void setLogTarget(LogStream stream, const std::string& target) { setStreamTarget(stream, target); }
 
-std::string dataDirectory() { return Runtime::instance().config().dataDir; }
+std::string dataDirectory() { return CurrentConfig::instance().get().dataDir; }
 
 std::vector<OverlayEntry> overlayEntries() {
   std::vector<OverlayEntry> entries;

@@ -8,6 +8,7 @@
 #include <utility>
 
 #include "agent/Seams.h"
+#include "agent/config/CurrentConfig.h"
 #include "agent/log/LogOutput.h"
 #include "agent/sources/FileSource.h"
 #include "agent/sources/HostSource.h"
@@ -30,58 +31,25 @@ Runtime& Runtime::instance() {
   return runtime;
 }
 
+// The log registers before, so that its lock is taken after these over a fork, as elsewhere.
 Runtime::Runtime() : process_(::getpid()) {
-  // A thread that is inside while another one forks would leave its locks held in the child for ever. The C library
-  // forgets these when the library is unloaded.
+  watchForksOfLog();
   ::pthread_atfork([] { instance().holdStill(); }, [] { instance().goOn(); }, [] { instance().goOn(); });
 }
 
-// In the order in which the locks are taken elsewhere.
 void Runtime::holdStill() {
   lookMutex_.lock();
   latestMutex_.lock();
-  lockLog();
-  configMutex_.lock();
 }
 
 void Runtime::goOn() {
-  configMutex_.unlock();
-  unlockLog();
   latestMutex_.unlock();
   lookMutex_.unlock();
 }
 
-const Runtime::LoadedConfig& Runtime::loadedConfig() {
-  const LoadedConfig* loaded = loadedConfig_.load(std::memory_order_acquire);
-  if (loaded != nullptr) return *loaded;
-  const std::lock_guard lock(configMutex_);
-  loaded = loadedConfig_.load(std::memory_order_relaxed);
-  if (loaded != nullptr) return *loaded;
-  LoadedConfig fresh;
-  try {
-    fresh.config = readDefaultConfig();
-  } catch (const ConfigError& error) {
-    fresh.error = error;
-  }
-  configs_.push_back(std::move(fresh));
-  loadedConfig_.store(&configs_.back(), std::memory_order_release);
-  return configs_.back();
-}
-
-const Config& Runtime::config() { return loadedConfig().config; }
-
-void Runtime::checkConfig() {
-  const LoadedConfig& loaded = loadedConfig();
-  if (loaded.error.has_value()) throw ConfigError(*loaded.error);
-}
-
 void Runtime::useConfig(const Config& config) {
   const std::lock_guard look(lookMutex_);
-  {
-    const std::lock_guard lock(configMutex_);
-    configs_.push_back({config, std::nullopt});
-    loadedConfig_.store(&configs_.back(), std::memory_order_release);
-  }
+  CurrentConfig::instance().use(config);
   if (!sourceIsGiven_) source_ = nullptr;
   forgetTree();
 }
@@ -97,10 +65,11 @@ std::shared_ptr<const TreeSnapshot> Runtime::look() {
 }
 
 std::shared_ptr<const TreeSnapshot> Runtime::lookAndRead() {
-  checkConfig();
+  CurrentConfig::instance().check();
   if (process_ != ::getpid()) followFork();
-  if (source_ == nullptr) source_ = makeSource(config());
-  if (!overlay_.has_value()) overlay_.emplace(config().dataDir);
+  const Config& config = CurrentConfig::instance().get();
+  if (source_ == nullptr) source_ = makeSource(config);
+  if (!overlay_.has_value()) overlay_.emplace(config.dataDir);
 
   // Both are asked every time, so that neither piles up reports.
   const bool sourceChanged = source_->changed();
@@ -171,9 +140,9 @@ std::shared_ptr<const TreeSnapshot> Runtime::latestForCursor() {
 }
 
 std::string Runtime::systemName() {
-  const LoadedConfig& loaded = loadedConfig();
-  if (!loaded.config.systemName.empty()) return loaded.config.systemName;
-  if (loaded.error.has_value()) return util::kernelHostName();
+  CurrentConfig& current = CurrentConfig::instance();
+  if (const std::string& name = current.get().systemName; !name.empty()) return name;
+  if (current.isWrong()) return util::kernelHostName();
   try {
     // Of the tree that the latest cursor was placed in: a name is told many times in one operation, and must not change
     // on the way.
@@ -210,8 +179,8 @@ bool Runtime::store(const std::string& path, PropertyNumber property, const Prop
 }
 
 Overlay Runtime::overlay() {
-  checkConfig();
-  return Overlay(config().dataDir);
+  CurrentConfig::instance().check();
+  return Overlay(CurrentConfig::instance().get().dataDir);
 }
 
 void Runtime::overlayHasChanged() {
@@ -241,7 +210,7 @@ void Runtime::reset() {
   syslogIsInformed_ = false;
   sourceIsGiven_ = false;
   source_ = nullptr;
-  loadedConfig_.store(nullptr, std::memory_order_release);
+  CurrentConfig::instance().forget();
   forgetTree();
 }
 

@@ -1,10 +1,9 @@
-// The state of the agent in this process: configuration, source, latest snapshot.
+// The state of the agent in this process: source, overlay, latest snapshot.
 #pragma once
 
 #include <sys/types.h>
 
 #include <atomic>
-#include <deque>
 #include <memory>
 #include <mutex>
 #include <optional>
@@ -22,13 +21,6 @@ namespace zorva::agent {
 class Runtime {
  public:
   static Runtime& instance();
-
-  // The configuration, read when it is first asked for; the built-in defaults where it is wrong. What this returns
-  // stays valid until the library is unloaded.
-  const Config& config();
-
-  // Throws the ConfigError of a configuration that is wrong.
-  void checkConfig();
 
   // Takes this configuration, and lets go of the source and the snapshot that came from another.
   void useConfig(const Config& config);
@@ -60,14 +52,8 @@ class Runtime {
   void reset();
 
  private:
-  struct LoadedConfig {
-    Config config;
-    std::optional<ConfigError> error;
-  };
-
   Runtime();
 
-  const LoadedConfig& loadedConfig();
   std::shared_ptr<const TreeSnapshot> lookAndRead();
   void reportOnce(const std::string& problem);
   void followFork();
@@ -76,10 +62,6 @@ class Runtime {
   void goOn();
 
   std::atomic<bool> throws_ = false;
-
-  std::mutex configMutex_;
-  std::deque<LoadedConfig> configs_;  // the last one holds; earlier ones stay for those who point at them
-  std::atomic<const LoadedConfig*> loadedConfig_ = nullptr;
 
   std::mutex lookMutex_;  // over everything from here to latestMutex_
   pid_t process_;         // whose sockets and watches these are

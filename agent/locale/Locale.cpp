@@ -2,7 +2,7 @@
 
 #include <array>
 
-#include "agent/Runtime.h"
+#include "agent/config/CurrentConfig.h"
 #include "agent/interface/StringConversion.h"
 
 namespace ZV {
@@ -44,7 +44,7 @@ std::wstring findText(const std::string& library, const std::string& key, bool i
 
 }  // namespace
 
-std::string Locale::getLanguageId() { return zorva::agent::Runtime::instance().config().language; }
+std::string Locale::getLanguageId() { return zorva::agent::CurrentConfig::instance().get().language; }
 
 std::wstring Locale::getResourceLibrary(unsigned long number, std::string language) {
   return make_wstring(libraryName(number, language));

@@ -1,6 +1,7 @@
 #include "agent/log/LogOutput.h"
 
 #include <fcntl.h>
+#include <pthread.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -11,7 +12,7 @@
 #include <mutex>
 #include <stdexcept>
 
-#include "agent/Runtime.h"
+#include "agent/config/CurrentConfig.h"
 #include "util/Escape.h"
 #include "util/FileDescriptor.h"
 #include "util/ReadFile.h"
@@ -124,8 +125,17 @@ struct Stream {
   Logger logger;
 };
 
+constinit std::mutex outputMutex;
+
 class Output {
  public:
+  // What is registered first is locked last over a fork: a line takes the log's lock, then the configuration's.
+  Output() {
+    CurrentConfig::instance();
+    const auto unlock = [] { outputMutex.unlock(); };
+    ::pthread_atfork([] { outputMutex.lock(); }, unlock, unlock);
+  }
+
   ~Output() {
     // A line that comes while the process ends is dropped.
     logThreshold = kNothing;
@@ -180,7 +190,7 @@ class Output {
   void configure() {
     if (configured_) return;
     configured_ = true;
-    const Config& config = Runtime::instance().config();
+    const Config& config = CurrentConfig::instance().get();
     streams_[0] = open(config.logLevel, config.logTarget);
     streams_[1] = open(config.traceLevel, config.traceTarget);
     publishThresholds();
@@ -209,8 +219,6 @@ class Output {
   bool configured_ = false;
   std::array<Stream, 2> streams_;
 };
-
-constinit std::mutex outputMutex;
 
 Output& output() {
   static Output instance;
@@ -256,8 +264,9 @@ void resetLog() {
   output().reset();
 }
 
-void lockLog() { outputMutex.lock(); }
-
-void unlockLog() { outputMutex.unlock(); }
+void watchForksOfLog() {
+  const std::lock_guard lock(outputMutex);
+  output();
+}
 
 }  // namespace zorva::agent

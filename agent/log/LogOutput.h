@@ -36,8 +36,7 @@ void setStreamTarget(LogStream stream, const std::string& target);
 // Forgets the sink and all settings; the next line asks the configuration again.
 void resetLog();
 
-// Hold the log still over a fork.
-void lockLog();
-void unlockLog();
+// From now on a fork waits until no line is being written. The first line does the same.
+void watchForksOfLog();
 
 }  // namespace zorva::agent

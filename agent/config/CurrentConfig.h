@@ -1,0 +1,50 @@
+// The configuration of this process.
+#pragma once
+
+#include <atomic>
+#include <deque>
+#include <mutex>
+#include <optional>
+
+#include "agent/config/Config.h"
+
+namespace zorva::agent {
+
+// One for the process, made when it is first asked for, ended when the library is unloaded. Thread-safe. A fork waits
+// until nobody is inside, so that the child finds it whole.
+class CurrentConfig {
+ public:
+  static CurrentConfig& instance();
+
+  // The configuration, read when it is first asked for; the built-in defaults where it is wrong. What this returns
+  // stays valid until the library is unloaded.
+  const Config& get() { return loaded().config; }
+
+  // Whether the configuration is wrong, and the defaults are used.
+  bool isWrong() { return loaded().error.has_value(); }
+
+  // Throws the ConfigError of a configuration that is wrong.
+  void check();
+
+  // Uses this configuration from now on.
+  void use(const Config& config);
+
+  // The next question reads it again.
+  void forget() { loaded_.store(nullptr, std::memory_order_release); }
+
+ private:
+  struct Loaded {
+    Config config;
+    std::optional<ConfigError> error;
+  };
+
+  CurrentConfig();
+
+  const Loaded& loaded();
+
+  std::mutex mutex_;
+  std::deque<Loaded> configs_;  // the last one holds; earlier ones stay for those who point at them
+  std::atomic<const Loaded*> loaded_ = nullptr;
+};
+
+}  // namespace zorva::agent
