@@ -2,6 +2,7 @@
 #include <cmpidt.h>
 #include <cmpift.h>
 
+#include "cmpi/support/ProviderFrame.h"
 #include "host/HostObjects.h"
 #include "host/InstanceOperations.h"
 
@@ -43,12 +44,9 @@ struct Provider {
     return refuse(broker, "ExecQuery");
   }
 
-  static CMPIInstanceMI* make(const CMPIBroker* newBroker, const char* name) {
-    static CMPIInstanceMIFT table = {200, 200,    name,   cleanup, enumNames, enumInstances,
-                                     get, create, modify, remove,  query};
-    static CMPIInstanceMI mi = {nullptr, &table};
-    broker = newBroker;
-    return &mi;
+  static constexpr CMPIInstanceMIFT table(const char* name) {
+    return cmpi::tableOf<CMPIInstanceMIFT>(cmpi::kTableVersion, cmpi::kTableVersion, name, cleanup, enumNames,
+                                           enumInstances, get, create, modify, remove, query);
   }
 };
 
@@ -56,23 +54,14 @@ struct Provider {
 
 }  // namespace zorva::host
 
-#define ZORVA_HOST_EXPORT extern "C" __attribute__((visibility("default")))
+// The provider of what that function publishes.
+#define ZORVA_HOST_PROVIDER(prefix, publish)                                                      \
+  namespace zorva::host {                                                                         \
+  static constinit CMPIInstanceMIFT prefix##Table = Provider<publish>::table("instance" #prefix); \
+  }                                                                                               \
+  ZORVA_CREATE_MI(Instance, prefix, ::zorva::host::prefix##Table,                                 \
+                  ::zorva::host::Provider<::zorva::host::publish>::broker)
 
-ZORVA_HOST_EXPORT CMPIInstanceMI* HostComputerSystemProvider_Create_InstanceMI(const CMPIBroker* broker,
-                                                                               const CMPIContext*, CMPIStatus*) {
-  using namespace zorva::host;
-  return Provider<computerSystems>::make(broker, "instanceHostComputerSystemProvider");
-}
-
-ZORVA_HOST_EXPORT CMPIInstanceMI* HostIPProtocolEndpointProvider_Create_InstanceMI(const CMPIBroker* broker,
-                                                                                   const CMPIContext*, CMPIStatus*) {
-  using namespace zorva::host;
-  return Provider<ipEndpoints>::make(broker, "instanceHostIPProtocolEndpointProvider");
-}
-
-ZORVA_HOST_EXPORT CMPIInstanceMI* HostIPAssignmentSettingDataProvider_Create_InstanceMI(const CMPIBroker* broker,
-                                                                                        const CMPIContext*,
-                                                                                        CMPIStatus*) {
-  using namespace zorva::host;
-  return Provider<ipAssignments>::make(broker, "instanceHostIPAssignmentSettingDataProvider");
-}
+ZORVA_HOST_PROVIDER(HostComputerSystemProvider, computerSystems)
+ZORVA_HOST_PROVIDER(HostIPProtocolEndpointProvider, ipEndpoints)
+ZORVA_HOST_PROVIDER(HostIPAssignmentSettingDataProvider, ipAssignments)

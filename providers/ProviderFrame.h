@@ -10,31 +10,15 @@
 #include <string>
 #include <vector>
 
+#include "cmpi/support/ProviderFrame.h"
 #include "factory/CmpiSupport.h"
 #include "providers/Operation.h"
 #include "trace/Trace.h"
-
-#define ZV_PROVIDER_EXPORT extern "C" __attribute__((visibility("default")))
-
-// The version of the function tables that all CMPI 2.x servers accept.
-#define ZV_TABLE_VERSION 200
 
 namespace ZV {
 
 // Set by the source's create functions, the last call wins; read by its operations.
 static const CMPIBroker* broker = nullptr;
-
-constexpr CMPIStatus kNotSupported = {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
-
-// A function table of these members. Later versions of CMPI have appended slots to the tables; those stay null.
-template <typename Table, typename... Members>
-constexpr Table tableOf(Members... members) {
-  if constexpr (requires { Table{members..., nullptr}; }) {
-    return tableOf<Table>(members..., nullptr);
-  } else {
-    return Table{members...};
-  }
-}
 
 }  // namespace ZV
 
@@ -69,38 +53,23 @@ constexpr Table tableOf(Members... members) {
 #define ZV_INSTANCE_MI(prefix, stem)                                                                                 \
   namespace ZV {                                                                                                     \
   static constinit CMPIInstanceMIFT instMIFT__ = tableOf<CMPIInstanceMIFT>(                                          \
-      ZV_TABLE_VERSION, ZV_TABLE_VERSION, "instance" #prefix, stem##_Cleanup, stem##_EnumInstanceNames,              \
+      kTableVersion, kTableVersion, "instance" #prefix, stem##_Cleanup, stem##_EnumInstanceNames,                    \
       stem##_EnumInstances, stem##_GetInstance, stem##_CreateInstance, stem##_ModifyInstance, stem##_DeleteInstance, \
       stem##_ExecQuery);                                                                                             \
   }                                                                                                                  \
-  ZV_PROVIDER_EXPORT CMPIInstanceMI* prefix##_Create_InstanceMI(const CMPIBroker* broker, const CMPIContext*,        \
-                                                                CMPIStatus*) {                                       \
-    static CMPIInstanceMI mi = {nullptr, &ZV::instMIFT__};                                                           \
-    ZV::broker = broker;                                                                                             \
-    return &mi;                                                                                                      \
-  }
+  ZORVA_CREATE_MI(Instance, prefix, ::ZV::instMIFT__, ::ZV::broker)
 
-#define ZV_ASSOCIATION_MI(prefix, stem)                                                                             \
-  namespace ZV {                                                                                                    \
-  static constinit CMPIAssociationMIFT assocMIFT__ = tableOf<CMPIAssociationMIFT>(                                  \
-      ZV_TABLE_VERSION, ZV_TABLE_VERSION, "association" #prefix, stem##_AssociationCleanup, stem##_Associators,     \
-      stem##_AssociatorNames, stem##_References, stem##_ReferenceNames);                                            \
-  }                                                                                                                 \
-  ZV_PROVIDER_EXPORT CMPIAssociationMI* prefix##_Create_AssociationMI(const CMPIBroker* broker, const CMPIContext*, \
-                                                                      CMPIStatus*) {                                \
-    static CMPIAssociationMI mi = {nullptr, &ZV::assocMIFT__};                                                      \
-    ZV::broker = broker;                                                                                            \
-    return &mi;                                                                                                     \
-  }
-
-#define ZV_METHOD_MI(prefix, stem)                                                                        \
+#define ZV_ASSOCIATION_MI(prefix, stem)                                                                   \
   namespace ZV {                                                                                          \
-  static constinit CMPIMethodMIFT methMIFT__ = tableOf<CMPIMethodMIFT>(                                   \
-      ZV_TABLE_VERSION, ZV_TABLE_VERSION, "method" #prefix, stem##_MethodCleanup, stem##_InvokeMethod);   \
+  static constinit CMPIAssociationMIFT assocMIFT__ = tableOf<CMPIAssociationMIFT>(                        \
+      kTableVersion, kTableVersion, "association" #prefix, stem##_AssociationCleanup, stem##_Associators, \
+      stem##_AssociatorNames, stem##_References, stem##_ReferenceNames);                                  \
   }                                                                                                       \
-  ZV_PROVIDER_EXPORT CMPIMethodMI* prefix##_Create_MethodMI(const CMPIBroker* broker, const CMPIContext*, \
-                                                            CMPIStatus*) {                                \
-    static CMPIMethodMI mi = {nullptr, &ZV::methMIFT__};                                                  \
-    ZV::broker = broker;                                                                                  \
-    return &mi;                                                                                           \
-  }
+  ZORVA_CREATE_MI(Association, prefix, ::ZV::assocMIFT__, ::ZV::broker)
+
+#define ZV_METHOD_MI(prefix, stem)                                                                                     \
+  namespace ZV {                                                                                                       \
+  static constinit CMPIMethodMIFT methMIFT__ = tableOf<CMPIMethodMIFT>(kTableVersion, kTableVersion, "method" #prefix, \
+                                                                       stem##_MethodCleanup, stem##_InvokeMethod);     \
+  }                                                                                                                    \
+  ZORVA_CREATE_MI(Method, prefix, ::ZV::methMIFT__, ::ZV::broker)

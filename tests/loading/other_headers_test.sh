@@ -30,11 +30,11 @@ fi
 cmake -S "$source" -B "$work/build" -G Ninja -DCMAKE_BUILD_TYPE=Debug -DZORVA_BUILD_TESTS=OFF \
   -DCMAKE_C_COMPILER="$4" -DCMAKE_CXX_COMPILER="$5" \
   -DZORVA_AGENT_INCLUDE_DIR="$work/headers/interface" -DZORVA_CMPI_INCLUDE_DIR="$work/headers/cmpi"
-cmake --build "$work/build" --target zorva_model zorva_settings zorva_factory zorva_providers
+cmake --build "$work/build" --target zorva_cmpi_support zorva_model zorva_settings zorva_factory zorva_providers
 
 used=$(ninja -C "$work/build" -t deps |
-  awk '/^(model|settings|factory|providers)\//{mine=1} /^[^ ]/&&!/^(model|settings|factory|providers)\//{mine=0} mine')
-if grep -E "^ +$source/(agent|cmpi|broker|schema|host|cli|server|cimxml)/" <<<"$used"; then
+  awk '/^(cmpi|model|settings|factory|providers)\//{mine=1} /^[^ ]/&&!/^(cmpi|model|settings|factory|providers)\//{mine=0} mine')
+if grep -E "^ +$source/(cmpi/[^/]*$|(agent|broker|schema|host|cli|server|cimxml|cimom|http|frontend)/)" <<<"$used"; then
   echo "the library has used headers that are not its own"
   exit 1
 fi

@@ -1,4 +1,4 @@
-#include "factory/CmpiSupport.h"
+#include "cmpi/support/CmpiSupport.h"
 
 #include <gmock/gmock.h>
 
@@ -9,6 +9,7 @@
 namespace ZV::Test {
 namespace {
 
+using namespace zorva::cmpi;
 using ::testing::IsEmpty;
 
 // A factory function may return null, or an object without a handle: then it is not used.
