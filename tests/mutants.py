@@ -4,7 +4,7 @@
 A mutant is the library with one literal, one comparison or the order of two calls changed. Each is built and the tests
 are run, those nearest to the changed source first, until one fails: the mutant is killed. A mutant that no test kills
 survives; each survivor is printed with its place. Mutants are drawn at random, but alike for the same --seed, from all
-sources of the five folders in proportion to what can be changed in them.
+sources of its folders in proportion to what can be changed in them.
 
 Work is done on copies of the tree under build/mutants; the checkout itself is not touched.
 
@@ -22,16 +22,17 @@ import sys
 import threading
 import time
 
-FOLDERS = ["trace", "model", "settings", "factory", "providers"]
+FOLDERS = ["cmpi/support", "trace", "model", "settings", "factory", "providers"]
 # The programs that test the library, and which of them are nearest to a source. The faults are left out: they test
 # whether the library survives, which no mutant changes, and take a minute.
 PROGRAMS = [
-    "trace_test", "model_test", "settings_test", "settings_line_feed_test", "factory_client_test",
+    "cmpi_support_test", "trace_test", "model_test", "settings_test", "settings_line_feed_test", "factory_client_test",
     "factory_setting_test", "factory_association_targets_test", "provider_client_test", "provider_setting_test",
     "provider_associations_test", "provider_setting_association_test", "conformance_test",
     "library_test",
 ]
 NEAREST = [
+    (r"cmpi/support/", ["cmpi_support_test", "factory_client_test", "provider_associations_test"]),
     (r"trace/", ["trace_test"]),
     (r"model/", ["model_test"]),
     (r"settings/", ["settings_test", "settings_line_feed_test"]),
