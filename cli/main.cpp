@@ -3,9 +3,9 @@
 #include <variant>
 
 #include "agent/Agent.h"
-#include "cli/Arguments.h"
-#include "cli/Failure.h"
-#include "cli/Session.h"
+#include "cli/commands/Arguments.h"
+#include "cli/output/Failure.h"
+#include "cli/session/Session.h"
 
 namespace {
 

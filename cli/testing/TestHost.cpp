@@ -16,7 +16,7 @@
 #include <filesystem>
 #include <stdexcept>
 
-#include "cli/Text.h"
+#include "cli/output/Text.h"
 
 namespace zorva::cli {
 

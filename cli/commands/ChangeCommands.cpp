@@ -1,0 +1,122 @@
+// modify, invoke.
+#include <algorithm>
+
+#include "cli/commands/Commands.h"
+#include "cli/output/Failure.h"
+#include "cli/output/JsonOutput.h"
+#include "cli/output/ResultWriter.h"
+#include "cli/output/Text.h"
+#include "cli/output/ValueText.h"
+#include "cli/session/Assignments.h"
+#include "cli/session/Change.h"
+#include "cli/session/HostView.h"
+#include "cli/session/Paths.h"
+#include "cli/session/Session.h"
+
+namespace zorva::cli {
+
+namespace {
+
+template <class Element>
+std::string namesOf(const std::vector<Element>& elements) {
+  std::vector<std::string> names;
+  names.reserve(elements.size());
+  for (const auto& element : elements) names.push_back(element->name);
+  return joined(names, ", ");
+}
+
+broker::Property parseChange(const schema::Class& declared, const Assignment& assignment) {
+  const schema::ClassProperty* property = declared.findProperty(assignment.name);
+  if (property == nullptr) {
+    throw Failure(ExitCode::WrongUsage,
+                  "the class " + declared.name() + " has no property " + printable(assignment.name),
+                  "it has " + namesOf(declared.properties()));
+  }
+  if (property->isKey) {
+    throw Failure(ExitCode::WrongUsage, property->name + " is a key of " + declared.name() + " and cannot be changed");
+  }
+  return {property->name, parseValue({property->name, property->type, property->isArray}, assignment.texts), property};
+}
+
+const schema::ClassMethod& methodNamed(const schema::Class& declared, const std::string& name) {
+  const schema::ClassMethod* method = declared.findMethod(name);
+  if (method != nullptr) return *method;
+  throw Failure(ExitCode::WrongUsage, "the class " + declared.name() + " has no method " + printable(name),
+                declared.methods().empty() ? "it has none" : "it has " + namesOf(declared.methods()));
+}
+
+broker::NamedValue parseParameter(const schema::ClassMethod& method, const Assignment& assignment) {
+  for (const schema::Parameter& parameter : method.parameters) {
+    if (!util::sameName(parameter.name, assignment.name)) continue;
+    return {parameter.name, parseValue({parameter.name, parameter.type, parameter.isArray}, assignment.texts)};
+  }
+  std::vector<std::string> names;
+  for (const schema::Parameter& parameter : method.parameters) names.push_back(parameter.name);
+  throw Failure(ExitCode::WrongUsage, method.name + " has no parameter " + printable(assignment.name),
+                names.empty() ? "it has none" : "it has " + joined(names, ", "));
+}
+
+/// "SetDNSDomain takes DNSDomain (string)".
+std::string parametersOf(const schema::ClassMethod& method) {
+  std::vector<std::string> parameters;
+  for (const schema::Parameter& each : method.parameters) {
+    parameters.push_back(each.name + " (" + std::string(schema::typeName(each.type)) +
+                         (each.isArray ? ", repeated" : "") + ")");
+  }
+  return method.name + " takes " + (parameters.empty() ? "no parameters" : joined(parameters, ", "));
+}
+
+std::string methodTable(const broker::MethodResult& result, const Layout& layout) {
+  Table table;
+  table.add({"ReturnValue", valueText(result.returnValue, nullptr)});
+  for (const broker::NamedValue& output : result.output) table.add({output.name, valueText(output.value, nullptr)});
+  return table.text(layout);
+}
+
+}  // namespace
+
+void modifyInstance(const Arguments& arguments) {
+  requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "modify");
+  Session session(arguments);
+  const std::vector<Assignment> assignments = parseAssignments(arguments.values);
+  const broker::ObjectPath path = resolvePath(session, arguments.target);
+  const schema::Class& declared = session.classNamed(path.className);
+  std::vector<broker::Property> changes;
+  changes.reserve(assignments.size());
+  for (const Assignment& assignment : assignments) changes.push_back(parseChange(declared, assignment));
+
+  const ChangeOptions options{arguments.only, arguments.dryRun};
+  const Session::Changing alone(session, options.dryRun);
+  const broker::Instance instance = changeInstance(session, path, changes, options);
+  if (arguments.output == OutputFormat::Json) {
+    write(instanceJson(instance, 0) + "\n");
+  } else {
+    writeChanges(session, instance, changes, options);
+  }
+}
+
+void invokeMethod(const Arguments& arguments) {
+  requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "invoke");
+  Session session(arguments);
+  const std::vector<Assignment> assignments = parseAssignments(arguments.values);
+  const broker::ObjectPath path = resolvePath(session, arguments.target);
+  const schema::ClassMethod& method = methodNamed(session.classNamed(path.className), arguments.method);
+  std::vector<broker::NamedValue> input;
+  input.reserve(assignments.size());
+  for (const Assignment& assignment : assignments) input.push_back(parseParameter(method, assignment));
+
+  broker::MethodResult result;
+  const broker::Status status = session.cim().invokeMethod(path, method.name, input, result);
+  if (!status.ok()) throw operationFailure(method.name + " of " + shortPathText(path), status, parametersOf(method));
+  write(arguments.output == OutputFormat::Json ? methodResultJson(result) + "\n"
+                                               : methodTable(result, session.layout()));
+  if (path.className == kEndpointClass) {
+    tellNote(method.name +
+             " checks and answers, and changes nothing; 'zorvactl dns', 'domain', 'suffixes' and 'modify' do");
+  }
+  if (const std::string value = valueText(result.returnValue, nullptr); value != "0" && !result.returnValue.isNull) {
+    throw Failure(ExitCode::Failed, method.name + " returned " + value);
+  }
+}
+
+}  // namespace zorva::cli

@@ -1,0 +1,106 @@
+// graph.
+#include <fcntl.h>
+#include <spawn.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <csignal>
+#include <cstring>
+
+#include "cli/commands/Commands.h"
+#include "cli/commands/Graph.h"
+#include "cli/output/Failure.h"
+#include "cli/output/JsonOutput.h"
+#include "cli/output/ResultWriter.h"
+#include "cli/session/Paths.h"
+#include "cli/session/Session.h"
+#include "util/FileDescriptor.h"
+
+extern char** environ;
+
+namespace zorva::cli {
+
+namespace {
+
+/// Starts Graphviz's dot with its input at `input`; its output is that of this process.
+pid_t startDot(int input) {
+  const char* const words[] = {"dot", "-Tsvg", nullptr};
+  posix_spawn_file_actions_t actions;
+  ::posix_spawn_file_actions_init(&actions);
+  ::posix_spawn_file_actions_adddup2(&actions, input, STDIN_FILENO);
+  pid_t child = -1;
+  const int error = ::posix_spawnp(&child, words[0], &actions, nullptr, const_cast<char* const*>(words), environ);
+  ::posix_spawn_file_actions_destroy(&actions);
+  if (error == 0) return child;
+  throw Failure(ExitCode::Failed, std::string("cannot start Graphviz's dot: ") + std::strerror(error),
+                "install it (apt-get install graphviz), or use --output dot");
+}
+
+/// Writes to a pipe whose reader may end early.
+void feed(int pipe, std::string_view text) {
+  while (!text.empty()) {
+    const ssize_t written = ::write(pipe, text.data(), text.size());
+    if (written < 0 && errno != EINTR) return;
+    if (written > 0) text.remove_prefix(static_cast<std::size_t>(written));
+  }
+}
+
+void writeSvg(const std::string& dot) {
+  flushOutput();
+  int ends[2];
+  if (::pipe2(ends, O_CLOEXEC) != 0) {
+    throw Failure(ExitCode::Failed, std::string("cannot make a pipe: ") + std::strerror(errno));
+  }
+  util::FileDescriptor output(ends[0]);
+  util::FileDescriptor input(ends[1]);
+  std::signal(SIGPIPE, SIG_IGN);
+  const pid_t child = startDot(output.get());
+  output.reset();
+  feed(input.get(), dot);
+  input.reset();
+  int status = 0;
+  while (::waitpid(child, &status, 0) < 0 && errno == EINTR) {
+  }
+  if (!WIFEXITED(status) || WEXITSTATUS(status) != 0) {
+    throw Failure(ExitCode::Failed, "Graphviz's dot did not draw the graph", "--output dot shows what it was given");
+  }
+}
+
+Graph graphOf(Session& session, const Arguments& arguments) {
+  Progress progress;
+  const std::vector<broker::ObjectPath> roots =
+      arguments.target.empty() ? allObjects(session, progress)
+                               : std::vector<broker::ObjectPath>{resolvePath(session, arguments.target)};
+  return walkGraph(session, progress, roots, arguments.all);
+}
+
+}  // namespace
+
+void showGraph(const Arguments& arguments) {
+  requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json, OutputFormat::Dot, OutputFormat::Svg},
+                "graph");
+  Session session(arguments);
+  const Session::Quiet quiet(session);
+  const Graph graph = graphOf(session, arguments);
+  if (graph.notFollowed != 0) {
+    tellNote(
+        "of this many objects " + std::to_string(graph.notFollowed) +
+        " were not asked for their associations; graph PATH begins at one of them, --all asks all, which takes long");
+  }
+  switch (arguments.output) {
+    case OutputFormat::Json:
+      write(graphJson(graph) + "\n");
+      return;
+    case OutputFormat::Dot:
+      write(graphDot(graph));
+      return;
+    case OutputFormat::Svg:
+      writeSvg(graphDot(graph));
+      return;
+    default:
+      write(graphText(graph, session.layout()));
+  }
+}
+
+}  // namespace zorva::cli

@@ -1,0 +1,65 @@
+#pragma once
+
+#include "cli/operations/Operations.h"
+#include "frontend/ReadBack.h"
+
+// The CIM operations done by the providers in this process.
+
+namespace zorva::cli {
+
+class LocalOperations : public Operations {
+ public:
+  /// The providers are loaded when they are first asked.
+  LocalOperations(std::shared_ptr<const schema::ClassRepository> classes, broker::BrokerOptions options)
+      : broker_(std::move(classes), std::move(options)) {}
+
+  broker::Status enumerateInstances(std::string_view nameSpace, std::string_view className,
+                                    const broker::Selection& selection, const broker::InstanceSink& sink) override {
+    return broker_.enumerateInstances(nameSpace, className, selection, sink);
+  }
+  broker::Status enumerateInstanceNames(std::string_view nameSpace, std::string_view className,
+                                        const broker::PathSink& sink) override {
+    return broker_.enumerateInstanceNames(nameSpace, className, sink);
+  }
+  broker::Status getInstance(const broker::ObjectPath& path, const broker::Selection& selection,
+                             broker::Instance& instance) override {
+    const broker::Status status = broker_.getInstance(path, selection, instance);
+    // As it was asked for, whatever order the provider has.
+    if (status.ok()) instance.path.keys = path.keys;
+    return status;
+  }
+  broker::Status modifyInstance(const broker::Instance& instance,
+                                const std::optional<std::vector<std::string>>& propertyList) override {
+    return frontend::modifyInstance(broker_, instance, propertyList);
+  }
+  broker::Status associators(const broker::ObjectPath& path, const broker::AssociationFilter& filter,
+                             const broker::Selection& selection, const broker::InstanceSink& sink) override {
+    return broker_.associators(path, filter, selection, sink);
+  }
+  broker::Status associatorNames(const broker::ObjectPath& path, const broker::AssociationFilter& filter,
+                                 const broker::PathSink& sink) override {
+    return broker_.associatorNames(path, filter, sink);
+  }
+  broker::Status references(const broker::ObjectPath& path, const broker::AssociationFilter& filter,
+                            const broker::Selection& selection, const broker::InstanceSink& sink) override {
+    return broker_.references(path, filter, selection, sink);
+  }
+  broker::Status referenceNames(const broker::ObjectPath& path, const broker::AssociationFilter& filter,
+                                const broker::PathSink& sink) override {
+    return broker_.referenceNames(path, filter, sink);
+  }
+  broker::Status invokeMethod(const broker::ObjectPath& path, std::string_view method,
+                              const std::vector<broker::NamedValue>& input, broker::MethodResult& result) override {
+    return broker_.invokeMethod(path, method, input, result);
+  }
+  broker::Status canonicalPath(const broker::ObjectPath& path, broker::ObjectPath& canonical) override {
+    return broker_.canonicalPath(path, canonical);
+  }
+  const schema::Class* classNamed(std::string_view name) override { return broker_.classes().find(name); }
+  const std::vector<broker::ProviderEntry>& served() const override { return broker_.registry().entries(); }
+
+ private:
+  broker::Broker broker_;
+};
+
+}  // namespace zorva::cli

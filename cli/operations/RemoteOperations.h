@@ -1,0 +1,63 @@
+#pragma once
+
+#include <map>
+#include <memory>
+#include <string>
+
+#include "cimxml/ResponseReader.h"
+#include "cli/operations/HttpClient.h"
+#include "cli/operations/Operations.h"
+#include "cli/operations/ServerUrl.h"
+#include "util/Names.h"
+
+// The CIM operations asked of a server: CIM-XML over HTTP (DSP0200 1.4).
+
+namespace zorva::cli {
+
+class RemoteOperations : public Operations {
+ public:
+  /// Connects when it is first asked. `classes` are those that are known beforehand; others are asked for. Throws
+  /// Failure where the URL is wrong or libcurl cannot be loaded. The operations throw Failure where the server gives no
+  /// answer, or none that is CIM-XML.
+  RemoteOperations(std::string_view url, std::shared_ptr<const schema::ClassRepository> classes);
+  ~RemoteOperations() override;
+
+  broker::Status enumerateInstances(std::string_view nameSpace, std::string_view className,
+                                    const broker::Selection& selection, const broker::InstanceSink& sink) override;
+  broker::Status enumerateInstanceNames(std::string_view nameSpace, std::string_view className,
+                                        const broker::PathSink& sink) override;
+  broker::Status getInstance(const broker::ObjectPath& path, const broker::Selection& selection,
+                             broker::Instance& instance) override;
+  broker::Status modifyInstance(const broker::Instance& instance,
+                                const std::optional<std::vector<std::string>>& propertyList) override;
+  broker::Status associators(const broker::ObjectPath& path, const broker::AssociationFilter& filter,
+                             const broker::Selection& selection, const broker::InstanceSink& sink) override;
+  broker::Status associatorNames(const broker::ObjectPath& path, const broker::AssociationFilter& filter,
+                                 const broker::PathSink& sink) override;
+  broker::Status references(const broker::ObjectPath& path, const broker::AssociationFilter& filter,
+                            const broker::Selection& selection, const broker::InstanceSink& sink) override;
+  broker::Status referenceNames(const broker::ObjectPath& path, const broker::AssociationFilter& filter,
+                                const broker::PathSink& sink) override;
+  broker::Status invokeMethod(const broker::ObjectPath& path, std::string_view method,
+                              const std::vector<broker::NamedValue>& input, broker::MethodResult& result) override;
+  broker::Status canonicalPath(const broker::ObjectPath& path, broker::ObjectPath& canonical) override;
+  const std::vector<broker::ProviderEntry>& served() const override { return served_.entries(); }
+  const schema::Class* classNamed(std::string_view name) override;
+
+ private:
+  std::string nameSpaceOr(std::string_view given) const;
+  cimxml::CimResponse ask(std::string_view operation, const std::string& object, const std::string& message);
+  broker::Status handOut(cimxml::CimResponse response, const std::string& nameSpace,
+                         const broker::InstanceSink& sink) const;
+  broker::Status handOut(cimxml::CimResponse response, const std::string& nameSpace,
+                         const broker::PathSink& sink) const;
+
+  ServerUrl server_;
+  std::shared_ptr<const schema::ClassRepository> classes_;
+  broker::ProviderRegistry served_;
+  HttpClient http_;
+  /// Classes that were asked for, each with a repository of its own; null: the server has none of that name.
+  std::map<std::string, std::unique_ptr<schema::ClassRepository>, util::NameLess> fetched_;
+};
+
+}  // namespace zorva::cli

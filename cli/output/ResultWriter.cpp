@@ -1,0 +1,138 @@
+#include "cli/output/ResultWriter.h"
+
+#include <algorithm>
+#include <string>
+
+#include "cimxml/ElementWriter.h"
+#include "cli/output/Failure.h"
+#include "cli/output/JsonOutput.h"
+#include "cli/output/MofOutput.h"
+#include "cli/output/Text.h"
+#include "cli/output/ValueText.h"
+#include "cli/session/Session.h"
+
+namespace zorva::cli {
+
+namespace {
+
+class TableWriter : public ResultWriter {
+ public:
+  explicit TableWriter(const Layout& layout) : layout_(layout) {}
+
+  void add(const broker::Instance& instance) override {
+    if (any_) write("\n");
+    any_ = true;
+    write(styled(printable(shortPathText(instance.path)), Style::Heading, layout_) + "\n");
+    Table table({}, 2);
+    for (const broker::Property& property : instance.properties) {
+      table.add({property.name, property.value.isNull ? "-" : valueText(property.value, property.declaration)});
+    }
+    write(table.text(layout_));
+  }
+
+  void add(const broker::ObjectPath& path) override { write(printable(shortPathText(path)) + "\n"); }
+
+ private:
+  Layout layout_;
+  bool any_ = false;
+};
+
+class JsonWriter : public ResultWriter {
+ public:
+  explicit JsonWriter(Count count) : count_(count) {}
+
+  void add(const broker::Instance& instance) override { addText(instanceJson(instance, isList() ? 2 : 0)); }
+  void add(const broker::ObjectPath& path) override { addText(pathJson(path)); }
+
+  void finish() override {
+    if (isList()) write(any_ ? "\n]\n" : "[]\n");
+    if (!isList() && any_) write("\n");
+  }
+
+ private:
+  bool isList() const noexcept { return count_ == Count::Many; }
+
+  void addText(const std::string& text) {
+    if (isList()) write(any_ ? ",\n  " : "[\n  ");
+    any_ = true;
+    write(text);
+  }
+
+  Count count_;
+  bool any_ = false;
+};
+
+class MofWriter : public ResultWriter {
+ public:
+  void add(const broker::Instance& instance) override {
+    if (any_) write("\n");
+    any_ = true;
+    write(instanceMof(instance));
+  }
+
+ private:
+  bool any_ = false;
+};
+
+/// A declaration document: instances with their paths, which any CIM-XML reader can take.
+class XmlWriter : public ResultWriter {
+ public:
+  void add(const broker::Instance& instance) override {
+    begin();
+    std::string element = "<VALUE.OBJECTWITH";
+    const bool isLocal = instance.path.host.empty();
+    element += isLocal ? "LOCALPATH>" : "PATH>";
+    cimxml::appendInstancePath(element, instance.path);
+    cimxml::appendInstance(element, instance);
+    write(element + (isLocal ? "</VALUE.OBJECTWITHLOCALPATH>\n" : "</VALUE.OBJECTWITHPATH>\n"));
+  }
+
+  void finish() override {
+    begin();
+    write("</DECLGROUP.WITHPATH></DECLARATION></CIM>\n");
+  }
+
+ private:
+  void begin() {
+    if (begun_) return;
+    begun_ = true;
+    write(
+        "<?xml version=\"1.0\" encoding=\"utf-8\"?>\n"
+        "<CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.4\"><DECLARATION><DECLGROUP.WITHPATH>\n");
+  }
+
+  bool begun_ = false;
+};
+
+}  // namespace
+
+std::unique_ptr<ResultWriter> makeResultWriter(OutputFormat format, const Layout& layout, Count count,
+                                               Results results) {
+  if (results == Results::Names && (format == OutputFormat::Mof || format == OutputFormat::Xml)) {
+    throw Failure(ExitCode::WrongUsage, std::string("names of instances cannot be written as ") + formatName(format),
+                  "use --output json, or ask for the instances themselves");
+  }
+  switch (format) {
+    case OutputFormat::Table:
+      return std::make_unique<TableWriter>(layout);
+    case OutputFormat::Json:
+      return std::make_unique<JsonWriter>(count);
+    case OutputFormat::Mof:
+      return std::make_unique<MofWriter>();
+    case OutputFormat::Xml:
+      return std::make_unique<XmlWriter>();
+    default:
+      break;
+  }
+  throw Failure(ExitCode::WrongUsage, std::string("--output ") + formatName(format) + " does not fit these results");
+}
+
+void requireFormat(OutputFormat format, std::initializer_list<OutputFormat> allowed, const char* subcommand) {
+  if (std::find(allowed.begin(), allowed.end(), format) != allowed.end()) return;
+  std::vector<std::string> names;
+  for (const OutputFormat each : allowed) names.emplace_back(formatName(each));
+  throw Failure(ExitCode::WrongUsage, std::string("zorvactl ") + subcommand + " has no output as " + formatName(format),
+                "it writes " + joined(names, ", "));
+}
+
+}  // namespace zorva::cli

@@ -1,0 +1,131 @@
+#include "cli/output/Table.h"
+
+#include <sys/ioctl.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <string_view>
+#include <utility>
+
+#include "cli/output/Text.h"
+
+namespace zorva::cli {
+
+namespace {
+
+constexpr std::size_t kGap = 2;        // blanks between columns
+constexpr std::size_t kNarrowest = 8;  // no column gets narrower for want of room
+
+const char* escapeOf(Style style) noexcept {
+  switch (style) {
+    case Style::Heading:
+      return "\033[1m";
+    case Style::Good:
+      return "\033[32m";
+    case Style::Warning:
+      return "\033[33m";
+    case Style::Bad:
+      return "\033[31m";
+    case Style::Faint:
+      return "\033[2m";
+    case Style::Plain:
+      break;
+  }
+  return "";
+}
+
+std::size_t terminalWidth() noexcept {
+  winsize size{};
+  return ::ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0 ? size.ws_col : 0;
+}
+
+bool isSet(const char* variable) noexcept {
+  const char* value = std::getenv(variable);
+  return value != nullptr && *value != '\0';
+}
+
+/// The lines of one row, its fields wrapped into their columns.
+void appendRow(std::string& out, const std::vector<Cell>& row, const std::vector<std::size_t>& widths,
+               std::size_t indent, const Layout& layout) {
+  std::vector<std::vector<std::string>> columns;
+  std::size_t height = 1;
+  for (std::size_t i = 0; i < row.size(); ++i) {
+    columns.push_back(wrapped(row[i].text, widths[i]));
+    height = std::max(height, columns.back().size());
+  }
+  for (std::size_t line = 0; line < height; ++line) {
+    std::string blanks(indent, ' ');
+    for (std::size_t i = 0; i < columns.size(); ++i) {
+      std::string_view piece = line < columns[i].size() ? std::string_view(columns[i][line]) : std::string_view();
+      piece = piece.substr(0, piece.find_last_not_of(' ') + 1);
+      // Blanks go out only before the next text, so that no line ends in them.
+      if (!piece.empty()) out += blanks + styled(piece, row[i].style, layout);
+      if (!piece.empty()) blanks.clear();
+      blanks.append(widths[i] + kGap - std::min(widths[i], displayWidth(piece)), ' ');
+    }
+    out += '\n';
+  }
+}
+
+}  // namespace
+
+Layout Layout::ofStandardOutput() {
+  Layout layout;
+  if (::isatty(STDOUT_FILENO) == 0) return layout;
+  layout.width = terminalWidth();
+  const char* terminal = std::getenv("TERM");
+  layout.colours = !isSet("NO_COLOR") && terminal != nullptr && std::string_view(terminal) != "dumb";
+  return layout;
+}
+
+std::string styled(std::string_view text, Style style, const Layout& layout) {
+  if (!layout.colours || style == Style::Plain || text.empty()) return std::string(text);
+  return escapeOf(style) + std::string(text) + "\033[0m";
+}
+
+Table::Table(std::vector<std::string> headings, std::size_t indent) : indent_(indent) {
+  for (std::string& heading : headings) headings_.emplace_back(std::move(heading), Style::Heading);
+}
+
+void Table::add(std::vector<Cell> row) {
+  for (Cell& cell : row) cell.text = printable(cell.text);
+  rows_.push_back(std::move(row));
+}
+
+std::vector<std::size_t> Table::columnWidths(const Layout& layout) const {
+  std::vector<std::size_t> widths;
+  const auto widen = [&widths](const std::vector<Cell>& row) {
+    if (widths.size() < row.size()) widths.resize(row.size());
+    for (std::size_t i = 0; i < row.size(); ++i) widths[i] = std::max(widths[i], displayWidth(row[i].text));
+  };
+  widen(headings_);
+  for (const std::vector<Cell>& row : rows_) widen(row);
+  if (layout.width == 0 || widths.empty()) return widths;
+
+  std::size_t total = indent_ + kGap * (widths.size() - 1);
+  for (const std::size_t width : widths) total += width;
+  while (total > layout.width) {
+    const auto widest = std::max_element(widths.begin(), widths.end());
+    if (*widest <= kNarrowest) break;
+    // Down to the next widest column at once, so that a text of a megabyte takes few rounds.
+    std::size_t next = kNarrowest;
+    for (auto width = widths.begin(); width != widths.end(); ++width) {
+      if (width != widest && *width < *widest) next = std::max(next, *width);
+    }
+    const std::size_t cut = std::min(total - layout.width, std::max<std::size_t>(*widest - next, 1));
+    *widest -= cut;
+    total -= cut;
+  }
+  return widths;
+}
+
+std::string Table::text(const Layout& layout) const {
+  const std::vector<std::size_t> widths = columnWidths(layout);
+  std::string out;
+  if (!headings_.empty()) appendRow(out, headings_, widths, indent_, layout);
+  for (const std::vector<Cell>& row : rows_) appendRow(out, row, widths, indent_, layout);
+  return out;
+}
+
+}  // namespace zorva::cli

@@ -1,0 +1,122 @@
+#include "cli/session/Change.h"
+
+#include <algorithm>
+#include <optional>
+
+#include "cli/output/Failure.h"
+#include "cli/output/Table.h"
+#include "cli/output/Text.h"
+#include "cli/output/ValueText.h"
+#include "cli/session/HostView.h"
+#include "cmpidt.h"
+#include "frontend/ReadBack.h"
+#include "frontend/SettingPlace.h"
+#include "util/Names.h"
+
+namespace zorva::cli {
+
+namespace {
+
+bool isEmpty(const broker::Value& value) { return broker::hasSameEffect(value, broker::Value::null(value.type)); }
+
+/// Why a server says that it was done, and it was not.
+std::string reasonThere(const broker::Instance& now, const broker::Property& change) {
+  if (change.value.isNull) return frontend::reasonOnThisHost(now, change);
+  const char* key = frontend::settingKey(now.path.className, change.name);
+  if (key == nullptr) return "the server took it and still says otherwise";
+  return std::string("the interface's file of settings there is missing, or has no line ") + key +
+         "=; 'zorvactl ifcfg init', run on that host, makes it, then repeat this";
+}
+
+broker::Instance instanceToSend(const broker::Instance& found, const std::vector<broker::Property>& changes,
+                                bool only) {
+  broker::Instance sent;
+  sent.path = found.path;
+  sent.declaration = found.declaration;
+  // What the endpoint's provider gets is stored, also an empty text where the host says nothing; that would hide what
+  // the host says later.
+  const bool storesAll = found.path.className == kEndpointClass;
+  for (const broker::Property& property : found.properties) {
+    const bool isChanged = std::any_of(changes.begin(), changes.end(), [&](const broker::Property& change) {
+      return util::sameName(change.name, property.name);
+    });
+    if (only || isChanged || property.value.isNull || (storesAll && isEmpty(property.value))) continue;
+    sent.properties.push_back(property);
+  }
+  sent.properties.insert(sent.properties.end(), changes.begin(), changes.end());
+  return sent;
+}
+
+broker::Instance fetched(Session& session, const broker::ObjectPath& path) {
+  broker::Instance instance;
+  const broker::Status status = session.cim().getInstance(path, {}, instance);
+  if (!status.ok()) {
+    throw operationFailure(shortPathText(path), status, "zorvactl names " + path.className + " lists what there is");
+  }
+  return instance;
+}
+
+/// A failure where there is no file to hold a change: then it is so only because the host says so, too.
+broker::Status checkFiles(const broker::Instance& now, const std::vector<broker::Property>& wanted) {
+  std::vector<frontend::LostChange> lost;
+  for (const broker::Property& change : wanted) {
+    if (auto reason = frontend::missingFile(now, change.name)) lost.push_back({change.name, *reason});
+  }
+  return frontend::statusOf(lost);
+}
+
+void requireModified(const broker::ObjectPath& path, const broker::Status& status) {
+  if (status.ok()) return;
+  throw operationFailure("modifying " + shortPathText(path), status,
+                         status.rc == CMPI_RC_ERR_INVALID_PARAMETER
+                             ? "a host or domain name may hold letters, digits, '-', '_' and '.'; what else was to be "
+                               "changed may be stored already: zorvactl get shows it"
+                             : "");
+}
+
+}  // namespace
+
+broker::Instance changeInstance(Session& session, const broker::ObjectPath& path,
+                                const std::vector<broker::Property>& changes, const ChangeOptions& options) {
+  const broker::Instance found = fetched(session, path);
+  broker::Instance sent = instanceToSend(found, changes, options.only);
+  if (options.dryRun) {
+    for (const broker::Property& change : changes) {
+      const auto reason = session.isRemote() ? std::nullopt : frontend::missingPlace(found, change.name);
+      if (reason) tellWarning(change.name + " would not be stored: " + printable(*reason));
+    }
+    return sent;
+  }
+  std::optional<std::vector<std::string>> propertyList;
+  if (options.only) {
+    propertyList.emplace();
+    for (const broker::Property& change : changes) propertyList->push_back(change.name);
+  }
+  requireModified(found.path, session.cim().modifyInstance(sent, propertyList));
+  broker::Instance now = fetched(session, found.path);
+  // Here it has been checked already, before anybody else could change it.
+  requireModified(found.path,
+                  session.isRemote() ? frontend::checkChanges(now, changes, reasonThere) : checkFiles(now, changes));
+  return now;
+}
+
+void writeChanges(const Session& session, const broker::Instance& instance,
+                  const std::vector<broker::Property>& changes, const ChangeOptions& options) {
+  write(std::string(options.dryRun ? "would send " : "") + printable(shortPathText(instance.path)) + "\n");
+  Table table({}, 2);
+  if (options.dryRun) {
+    for (const broker::Property& property : instance.properties) {
+      table.add({property.name, valueText(property.value, property.declaration)});
+    }
+  } else {
+    // An empty list comes back as null.
+    for (const broker::Property& change : changes) {
+      const broker::Value* value = instance.property(change.name);
+      const bool isNull = value == nullptr || value->isNull;
+      table.add({change.name, isNull ? "" : valueText(*value, change.declaration)});
+    }
+  }
+  write(table.text(session.layout()));
+}
+
+}  // namespace zorva::cli

@@ -1,0 +1,313 @@
+#include "cli/session/HostView.h"
+
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <map>
+#include <string_view>
+#include <utility>
+
+#include "agent/Agent.h"
+#include "cli/output/Failure.h"
+#include "cli/output/ValueText.h"
+
+namespace zorva::cli {
+
+namespace {
+
+std::optional<std::uint64_t> numberOf(const broker::Instance& instance, std::string_view property) {
+  const broker::Value* value = instance.property(property);
+  if (value == nullptr || value->isNull) return std::nullopt;
+  const auto* number = std::get_if<std::uint64_t>(&value->scalar);
+  return number == nullptr ? std::nullopt : std::optional(*number);
+}
+
+std::vector<std::string> textsOf(const broker::Value& value) {
+  std::vector<std::string> texts;
+  if (value.isNull) return texts;
+  if (!value.isArray) return {scalarText(value.scalar)};
+  for (const broker::Scalar& element : value.elements) texts.push_back(scalarText(element));
+  return texts;
+}
+
+EndpointRow endpointRow(const broker::Instance& instance) {
+  EndpointRow row;
+  row.name = propertyText(instance, "Name");
+  row.system = propertyText(instance, "SystemName");
+  row.hostName = propertyText(instance, "Hostname");
+  row.domainName = propertyText(instance, "DomainName");
+  if (const broker::Value* suffixes = instance.property("DNSSuffixesToAppend")) row.suffixes = textsOf(*suffixes);
+  row.stateNumber = numberOf(instance, "EnabledState");
+  const auto declared = std::find_if(instance.properties.begin(), instance.properties.end(),
+                                     [](const broker::Property& property) { return property.name == "EnabledState"; });
+  if (row.stateNumber && declared != instance.properties.end() && declared->declaration != nullptr) {
+    const auto number = static_cast<std::int64_t>(*row.stateNumber);
+    row.state = valueWord(*declared->declaration, number).value_or(std::to_string(*row.stateNumber));
+  }
+  return row;
+}
+
+bool fileStands(const std::string& interface) {
+  struct stat status {};
+  return ::stat((zorva::agent::dataDirectory() + "ifcfg-" + interface).c_str(), &status) == 0;
+}
+
+/// A setting that the providers read from a file or the host.
+struct SettingName {
+  const char* property;
+  bool isList;
+  zorva::agent::PropertyNumber number;  ///< of the host's value; kNoNumber: it has no place but the file
+};
+
+constexpr zorva::agent::PropertyNumber kNoNumber = 0;
+
+constexpr SettingName kInterfaceSettings[] = {
+    {"RequestedHostname", false, ZV::NodeLexicon::PROP_HOST_NAME},
+    {"DomainName", false, ZV::NodeLexicon::PROP_DOMAIN_NAME},
+    {"DNSServerAddresses", true, ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES},
+    {"ConfigurationName", false, kNoNumber},
+};
+constexpr SettingName kHostSettings[] = {
+    {"DNSSuffixesToAppend", true, ZV::NodeLexicon::PROP_DNS_SUFFIXES},
+    {"ConfigurationName", false, kNoNumber},
+};
+
+/// Where the settings of an interface come from.
+struct Origin {
+  std::string interface;
+  const zorva::agent::Node* node = nullptr;  ///< null: it is not in the tree
+};
+
+/// The file alone decides: where it stands, a key that it lacks is an empty value and not the host's.
+SettingSource sourceOf(const Origin& origin, zorva::agent::PropertyNumber number, bool hasValue) {
+  if (fileStands(origin.interface)) return SettingSource::File;
+  if (number == kNoNumber || !hasValue) return SettingSource::None;
+  const zorva::agent::Property* property = origin.node == nullptr ? nullptr : origin.node->find(number);
+  return property != nullptr && property->overlaid ? SettingSource::Set : SettingSource::Host;
+}
+
+/// The configurations of a tree by the names of their interfaces; of several with one name the first.
+class Configurations {
+ public:
+  explicit Configurations(const zorva::agent::TreeSnapshot& tree) {
+    for (const zorva::agent::Node& node : tree.nodes()) {
+      const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
+      if (node.type() != zorva::agent::NodeType::NetworkIPConfig || name == nullptr) continue;
+      const bool isServiceProcessor = tree.parent(tree.parent(node)).description() == "BMC";
+      byName_.try_emplace({isServiceProcessor, *name}, &node);
+    }
+  }
+
+  /// Null where there is none.
+  const zorva::agent::Node* find(const std::string& interface, bool isServiceProcessor) const {
+    const auto found = byName_.find({isServiceProcessor, interface});
+    return found == byName_.end() ? nullptr : found->second;
+  }
+
+ private:
+  std::map<std::pair<bool, std::string_view>, const zorva::agent::Node*> byName_;
+};
+
+template <std::size_t Size>
+void addSettings(std::vector<SettingRow>& rows, const SettingName (&names)[Size], const broker::Instance& instance,
+                 const Origin* origin, const std::string& interface) {
+  for (const SettingName& name : names) {
+    SettingRow row;
+    row.interface = interface;
+    row.setting = name.property;
+    row.isList = name.isList;
+    const broker::Value* value = instance.property(name.property);
+    if (value != nullptr) row.values = textsOf(*value);
+    if (origin != nullptr) row.source = sourceOf(*origin, name.number, value != nullptr && !value->isNull);
+    rows.push_back(std::move(row));
+  }
+}
+
+/// The instances of a class, as far as they can be had; where they cannot, the view tells why.
+std::vector<broker::Instance> askedFor(Session& session, const char* className, HostView& view) {
+  std::vector<broker::Instance> instances;
+  const broker::Status status = session.cim().enumerateInstances({}, className, {}, [&](const broker::Instance& each) {
+    instances.push_back(each);
+    return true;
+  });
+  if (!status.ok()) addProblem(view.problems, className, statusText(status));
+  return instances;
+}
+
+void readServers(Session& session, HostView& view) {
+  for (const broker::Instance& instance : askedFor(session, kServerClass, view)) {
+    view.servers.push_back({numberOf(instance, "OrderOfAccess").value_or(0), propertyText(instance, "Name")});
+  }
+  std::stable_sort(view.servers.begin(), view.servers.end(),
+                   [](const ServerRow& a, const ServerRow& b) { return a.order < b.order; });
+}
+
+void readSettings(Session& session, HostView& view) {
+  const auto tree = session.isRemote() ? nullptr : session.tree();
+  std::optional<Configurations> configurations;
+  if (tree != nullptr) configurations.emplace(*tree);
+  for (const broker::Instance& instance : askedFor(session, kSettingClass, view)) {
+    Origin origin{interfaceOfSetting(instance)};
+    const bool isServiceProcessor = propertyText(instance, "InstanceID").starts_with("BMC%");
+    if (configurations) origin.node = configurations->find(origin.interface, isServiceProcessor);
+    addSettings(view.interfaceSettings, kInterfaceSettings, instance, tree == nullptr ? nullptr : &origin,
+                origin.interface);
+  }
+  Origin general{interfaceOfHostSettings(session).value_or("")};
+  std::stable_sort(view.interfaceSettings.begin(), view.interfaceSettings.end(),
+                   [](const SettingRow& a, const SettingRow& b) { return a.interface < b.interface; });
+  if (configurations) general.node = configurations->find(general.interface, false);
+  for (const broker::Instance& instance : askedFor(session, kGeneralSettingClass, view)) {
+    addSettings(view.hostSettings, kHostSettings, instance, tree == nullptr ? nullptr : &general, general.interface);
+  }
+}
+
+/// A server's host is what its computer systems say, the host itself first and not its service processor.
+std::string systemNameOf(Session& session, HostView& view) {
+  if (!session.isRemote()) {
+    const std::string& configured = zorva::agent::currentConfig().systemName;
+    return configured.empty() ? session.tree()->systemName() : configured;
+  }
+  for (const broker::Instance& instance : askedFor(session, kSystemClass, view)) {
+    if (instance.path.className == kSystemClass) return propertyText(instance, "Name");
+  }
+  return session.url();
+}
+
+}  // namespace
+
+const char* sourceName(SettingSource source) noexcept {
+  switch (source) {
+    case SettingSource::File:
+      return "file";
+    case SettingSource::Host:
+      return "host";
+    case SettingSource::Set:
+      return "set";
+    case SettingSource::None:
+      break;
+  }
+  return "-";
+}
+
+std::string interfaceOfSetting(const broker::Instance& setting) {
+  return frontend::interfaceOfId(propertyText(setting, "InstanceID"));
+}
+
+std::optional<std::string> interfaceOfHostSettings(const Session& session) {
+  if (session.isRemote()) return std::nullopt;
+  return frontend::interfaceOfHostSettings(*session.tree());
+}
+
+std::vector<broker::Instance> instancesOf(Session& session, std::string_view className) {
+  std::vector<broker::Instance> instances;
+  requireDone(className, session.cim().enumerateInstances({}, className, {}, [&](const broker::Instance& instance) {
+    instances.push_back(instance);
+    return true;
+  }));
+  return instances;
+}
+
+namespace {
+
+// Above this number of instances of one class the associations are not counted without being asked for.
+constexpr std::uint64_t kManyInstances = 500;
+
+ClassRow emptyRow(const Session& session, const broker::ProviderEntry& entry) {
+  ClassRow row{entry.className, {}, {}, std::nullopt, {}};
+  if (!session.isRemote()) {
+    row.provider = entry.prefix;
+    row.library = entry.library;
+  }
+  return row;
+}
+
+void count(Session& session, ClassRow& row) {
+  std::uint64_t count = 0;
+  // Instances of subclasses are counted at their own class.
+  const broker::Status status = session.cim().enumerateInstanceNames({}, row.name, [&](const broker::ObjectPath& path) {
+    count += path.className == row.name ? 1 : 0;
+    return true;
+  });
+  if (status.ok()) {
+    row.count = count;
+  } else {
+    row.problem = statusText(status);
+  }
+}
+
+}  // namespace
+
+std::vector<ClassRow> readClassRows(Session& session, Progress& progress, bool countsAll) {
+  const Session::Quiet quiet(session);
+  std::vector<ClassRow> rows;
+  for (const broker::ProviderEntry& entry : session.cim().served()) rows.push_back(emptyRow(session, entry));
+  std::uint64_t most = 0;
+  for (const bool associations : {false, true}) {
+    if (associations && most > kManyInstances && !countsAll) break;
+    for (ClassRow& row : rows) {
+      if (session.classNamed(row.name).isAssociation() != associations) continue;
+      progress.step("counting " + row.name);
+      count(session, row);
+      most = std::max(most, row.count.value_or(0));
+    }
+  }
+  return rows;
+}
+
+bool isUncounted(const std::vector<ClassRow>& rows) {
+  return std::any_of(rows.begin(), rows.end(), [](const ClassRow& row) { return !row.count && row.problem.empty(); });
+}
+
+bool HostView::couldAsk(std::string_view className) const {
+  return std::none_of(problems.begin(), problems.end(), [className](const Problem& each) {
+    return std::find(each.names.begin(), each.names.end(), className) != each.names.end();
+  });
+}
+
+void addProblem(std::vector<Problem>& problems, const std::string& name, const std::string& what) {
+  auto same =
+      std::find_if(problems.begin(), problems.end(), [&what](const Problem& each) { return each.what == what; });
+  if (same == problems.end()) same = problems.insert(same, {{}, what});
+  if (std::find(same->names.begin(), same->names.end(), name) == same->names.end()) same->names.push_back(name);
+}
+
+std::vector<Problem> problemsOf(const std::vector<ClassRow>& rows) {
+  std::vector<Problem> problems;
+  for (const ClassRow& row : rows) {
+    if (!row.problem.empty()) addProblem(problems, row.name, row.problem);
+  }
+  return problems;
+}
+
+std::string problemText(const Problem& problem) {
+  constexpr std::size_t kShownNames = 20;
+  const std::size_t shown = std::min(problem.names.size(), kShownNames);
+  std::string text = joined({problem.names.begin(), problem.names.begin() + static_cast<std::ptrdiff_t>(shown)}, ", ");
+  if (shown < problem.names.size()) text += " and " + std::to_string(problem.names.size() - shown) + " more";
+  return text + ": " + problem.what;
+}
+
+HostView readHostView(Session& session, Progress& progress, bool countsAll) {
+  const Session::Quiet quiet(session);
+  HostView view;
+  view.hasSources = !session.isRemote();
+  progress.step("reading the endpoints");
+  view.systemName = systemNameOf(session, view);
+  for (const broker::Instance& instance : askedFor(session, kEndpointClass, view)) {
+    view.endpoints.push_back(endpointRow(instance));
+  }
+  std::stable_sort(view.endpoints.begin(), view.endpoints.end(),
+                   [](const EndpointRow& a, const EndpointRow& b) { return a.name < b.name; });
+  progress.step("reading the servers");
+  readServers(session, view);
+  progress.step("reading the settings");
+  readSettings(session, view);
+  view.classes = readClassRows(session, progress, countsAll);
+  for (const ClassRow& row : view.classes) {
+    if (!row.problem.empty()) addProblem(view.problems, row.name, row.problem);
+  }
+  return view;
+}
+
+}  // namespace zorva::cli

@@ -1,0 +1,109 @@
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "cli/output/Progress.h"
+#include "cli/session/Session.h"
+#include "frontend/SettingsClaims.h"
+
+// What a person reads first: the DNS client configuration of the host in one view, asked of the providers.
+
+namespace zorva::cli {
+
+using frontend::kEndpointClass;
+using frontend::kGeneralSettingClass;
+using frontend::kSettingClass;
+inline constexpr const char* kServerClass = "ZORVA_RemoteServiceAccessPoint";
+inline constexpr const char* kSystemClass = "ZORVA_ComputerSystem";
+
+/// Where the value of a setting comes from: the interface's file, the host, a value that was set and stands in for the
+/// host's own, or nowhere.
+enum class SettingSource { File, Host, Set, None };
+
+const char* sourceName(SettingSource source) noexcept;
+
+struct EndpointRow {
+  std::string name;
+  std::string system;
+  std::optional<std::uint64_t> stateNumber;
+  std::string state;  ///< "Enabled"
+  std::string hostName;
+  std::string domainName;
+  std::vector<std::string> suffixes;
+};
+
+struct ServerRow {
+  std::uint64_t order = 0;
+  std::string address;
+};
+
+struct SettingRow {
+  std::string interface;  ///< whose file and host settings count
+  std::string setting;    ///< the property's name
+  bool isList = false;
+  std::vector<std::string> values;
+  SettingSource source = SettingSource::None;
+};
+
+struct ClassRow {
+  std::string name;
+  std::string provider;  ///< the prefix of its create functions; empty: not known, as with a server's
+  std::string library;
+  std::optional<std::uint64_t> count;  ///< absent: the provider cannot be asked, or that would take too long
+  std::string problem;                 ///< why it cannot be asked
+};
+
+/// Why some classes, or the associations of some objects, could not be asked.
+struct Problem {
+  std::vector<std::string> names;
+  std::string what;
+};
+
+struct HostView {
+  std::string systemName;
+  std::vector<EndpointRow> endpoints;  ///< in the order of their names
+  std::vector<ServerRow> servers;      ///< in search order
+  std::vector<SettingRow> interfaceSettings;
+  std::vector<SettingRow> hostSettings;
+  std::vector<ClassRow> classes;
+  bool hasSources = true;         ///< false: the settings' sources are not known, as with a server's
+  std::vector<Problem> problems;  ///< what could not be asked; its part of the view is empty
+
+  bool couldAsk(std::string_view className) const;
+};
+
+/// Adds a name to those with that reason.
+void addProblem(std::vector<Problem>& problems, const std::string& name, const std::string& what);
+
+/// The classes that could not be asked, those with the same reason together.
+std::vector<Problem> problemsOf(const std::vector<ClassRow>& rows);
+
+/// "ZORVA_A, ZORVA_B: CIM_ERR_FAILED (1): no library"; of many names the first ones and how many more.
+std::string problemText(const Problem& problem);
+
+/// Asks the providers. What one of them does not answer is left empty and told in `problems`. Endpoints and settings
+/// are in the order of their names.
+HostView readHostView(Session& session, Progress& progress, bool countsAll);
+
+/// The classes that the registry knows, with their instances counted. To count an association may take the square of
+/// the time that its ends take; where those are very many, that is done only if `countsAll`.
+std::vector<ClassRow> readClassRows(Session& session, Progress& progress, bool countsAll);
+
+/// Whether some class was not counted because that would take too long.
+bool isUncounted(const std::vector<ClassRow>& rows);
+
+/// The instances of a class. Throws Failure where they cannot be had.
+std::vector<broker::Instance> instancesOf(Session& session, std::string_view className);
+
+/// The interface whose settings an instance of ZORVA_DNSSettingData tells: what stands behind the "%" of its
+/// InstanceID.
+std::string interfaceOfSetting(const broker::Instance& setting);
+
+/// The interface whose file holds the settings of the host as a whole: that of the first configuration outside a
+/// service processor. Nothing where there is none, and with a server, which does not say.
+std::optional<std::string> interfaceOfHostSettings(const Session& session);
+
+}  // namespace zorva::cli

@@ -1,0 +1,230 @@
+#include "cli/session/Session.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <vector>
+
+#include "agent/Agent.h"
+#include "cli/operations/LocalOperations.h"
+#include "cli/operations/RemoteOperations.h"
+#include "cli/output/Failure.h"
+#include "cli/output/Progress.h"
+#include "cli/output/Text.h"
+#include "schema/Schema.h"
+#include "util/LogLevels.h"
+#include "util/Names.h"
+
+namespace zorva::cli {
+
+namespace {
+
+std::string similarNames(const schema::ClassRepository& classes, std::string_view name) {
+  std::vector<std::string> similar;
+  std::string wanted(name);
+  std::transform(wanted.begin(), wanted.end(), wanted.begin(), util::lowerAscii);
+  if (const std::size_t underscore = wanted.find('_'); underscore != std::string::npos) wanted.erase(0, underscore + 1);
+  for (const schema::Class* each : classes.classes()) {
+    std::string known = each->name();
+    std::transform(known.begin(), known.end(), known.begin(), util::lowerAscii);
+    const bool fits = wanted.size() >= 3 && known.find(wanted) != std::string::npos;
+    if (fits && known.starts_with("zorva_") && similar.size() < 5) similar.push_back(each->name());
+  }
+  if (similar.empty()) return "zorvactl classes lists them";
+  return "is it " + joined(similar, ", ") + "?";
+}
+
+void tell(const char* kind, std::string_view what) {
+  std::fflush(stdout);
+  Progress::makeRoom();
+  const std::string line = std::string("zorvactl: ") + kind + std::string(what) + "\n";
+  std::fwrite(line.data(), 1, line.size(), stderr);
+}
+
+/// Passes over what the providers log, and tells the agent's own lines.
+class QuietLog : public zorva::agent::LogSink {
+ public:
+  void record(const zorva::agent::LogCall& /*call*/) override {}
+  void recordOwn(int level, const std::string& message) override {
+    if (level >= util::kLevelWarning) tellWarning(printable(message));
+  }
+};
+
+QuietLog quietLog;
+
+/// Keeps the agent's own lines until it is known what becomes of the call.
+class HeldBackLog : public zorva::agent::LogSink {
+ public:
+  explicit HeldBackLog(int level) : level_(level) {}
+  void record(const zorva::agent::LogCall& call) override { recordOwn(call.level, call.message); }
+  void recordOwn(int level, const std::string& message) override {
+    if (level >= level_) lines_.push_back(message);
+  }
+  void tell() const {
+    for (const std::string& line : lines_) tellWarning(printable(line));
+  }
+
+ private:
+  int level_;
+  std::vector<std::string> lines_;
+};
+
+template <class Work>
+class Finally {
+ public:
+  explicit Finally(Work work) : work_(std::move(work)) {}
+  ~Finally() { work_(); }
+  Finally(const Finally&) = delete;
+  Finally& operator=(const Finally&) = delete;
+
+ private:
+  Work work_;
+};
+
+}  // namespace
+
+Session::Session(const Arguments& arguments)
+    : layout_(Layout::ofStandardOutput()),
+      url_(arguments.url),
+      logLevel_(arguments.logLevel.value_or(util::kLevelError)),
+      wantsLog_(arguments.logLevel.has_value()),
+      providerDirectory_(arguments.providerDirectory) {
+  if (isRemote()) return;
+  asFailure([&] {
+    zorva::agent::loadConfig(arguments.config);
+    if (arguments.logLevel) zorva::agent::setLogLevel(zorva::agent::LogStream::Log, *arguments.logLevel);
+    if (!arguments.logLevel) logLevel_ = zorva::agent::currentConfig().logLevel;
+  });
+}
+
+Session::~Session() = default;
+
+const std::shared_ptr<const schema::ClassRepository>& Session::classes() {
+  // A server may also have what describes it.
+  const auto set = isRemote() ? schema::ClassSet::Interop : schema::ClassSet::Profile;
+  if (classes_ == nullptr) classes_ = schema::loadBuiltInClasses(set);
+  return classes_;
+}
+
+const schema::Class& Session::classNamed(std::string_view name) {
+  const schema::Class* found = isRemote() ? cim().classNamed(name) : classes()->find(name);
+  if (found != nullptr) return *found;
+  throw Failure(ExitCode::WrongUsage, "there is no class " + printable(name), similarNames(*classes(), name));
+}
+
+std::shared_ptr<const zorva::agent::TreeSnapshot> Session::tree() const {
+  // What goes to the terminal anyway is told in this program's words, and a failure that ends it once.
+  const bool holdsBack = zorva::agent::currentConfig().logTarget == "stderr";
+  HeldBackLog log(logLevel_);
+  if (holdsBack) zorva::agent::setLogSink(&log);
+  const Finally restore([this] { placeLogSink(); });
+  auto tree = asFailure([] { return zorva::agent::currentTree(); });
+  log.tell();
+  return tree;
+}
+
+Operations& Session::cim() {
+  if (cim_ != nullptr) return *cim_;
+  if (isRemote()) {
+    cim_ = std::make_unique<RemoteOperations>(url_, classes());
+    return *cim_;
+  }
+  tree();
+  broker::BrokerOptions options;
+  options.providerDirectory =
+      providerDirectory_.empty() ? broker::ProviderRegistry::builtInDirectory() : providerDirectory_;
+  options.claim = claims_.hook();
+  options.log = [this](broker::LogLevel level, std::string_view text) { log(level, text); };
+  cim_ = std::make_unique<LocalOperations>(classes(), std::move(options));
+  return *cim_;
+}
+
+Session::Changing::Changing(Session& session, bool isDryRun) : quiet_(session) {
+  if (session.isRemote() || isDryRun) return;
+  try {
+    hold_.emplace(session.claims_);
+  } catch (const std::runtime_error& error) {
+    const bool isMissing = ::access(zorva::agent::dataDirectory().c_str(), F_OK) != 0;
+    throw Failure(ExitCode::Failed, "nothing was changed: " + printable(error.what()),
+                  isMissing ? "make the data directory, or name another: data_dir in the agent's configuration" : "");
+  }
+}
+
+void Session::placeLogSink() const {
+  if (isRemote()) return;
+  // A sink takes the lines of all targets: a file must not go without them.
+  const zorva::agent::Config& config = zorva::agent::currentConfig();
+  const bool isQuietLog = isQuiet() && config.logTarget == "stderr" && config.traceTarget == "off";
+  zorva::agent::setLogSink(isQuietLog ? &quietLog : nullptr);
+}
+
+Session::Quiet::Quiet(Session& session) : session_(session) {
+  ++session_.quiet_;
+  session_.placeLogSink();
+}
+
+Session::Quiet::~Quiet() {
+  --session_.quiet_;
+  session_.placeLogSink();
+}
+
+void Session::log(broker::LogLevel level, std::string_view text) const {
+  if (isQuiet() || static_cast<int>(level) < std::min(logLevel_, util::kLevelWarning)) return;
+  tell(level == broker::LogLevel::Error     ? "error: "
+       : level == broker::LogLevel::Warning ? "warning: "
+                                            : "",
+       printable(text));
+}
+
+bool Session::isThisHost(std::string_view name) const {
+  return isRemote() || util::sameName(name, "localhost") || util::sameName(name, tree()->systemName()) ||
+         util::sameName(name, zorva::agent::currentConfig().systemName);
+}
+
+void requireLocal(const Arguments& arguments, const char* subcommand) {
+  if (arguments.url.empty()) return;
+  throw Failure(ExitCode::WrongUsage,
+                std::string("zorvactl ") + subcommand + " is about files of this host, which no CIM server hands out",
+                "leave out --url, and run it on the host that is meant");
+}
+
+broker::Selection selectionOf(Session& session, const Arguments& arguments, const schema::Class* top) {
+  broker::Selection selection;
+  if (arguments.properties.empty()) return selection;
+  const std::vector<const schema::Class*>& classes = session.classes()->classes();
+  for (const std::string& property : arguments.properties) {
+    const auto hasIt = [&](const schema::Class* each) {
+      return (top == nullptr || each->isA(*top)) && each->findProperty(property) != nullptr;
+    };
+    if (std::any_of(classes.begin(), classes.end(), hasIt) || (top != nullptr && hasIt(top))) continue;
+    throw Failure(ExitCode::WrongUsage,
+                  (top == nullptr ? "no class" : "neither " + top->name() + " nor a class below it") +
+                      " has a property " + printable(property),
+                  "the same command without --property shows what there is");
+  }
+  selection.propertyList = arguments.properties;
+  return selection;
+}
+
+void tellError(std::string_view what, std::string_view hint) {
+  tell("", what);
+  if (!hint.empty()) tell("", hint);
+}
+
+void tellWarning(std::string_view what) { tell("warning: ", what); }
+
+void tellNote(std::string_view what) { tell("note: ", what); }
+
+void write(std::string_view text) {
+  if (std::fwrite(text.data(), 1, text.size(), stdout) != text.size()) flushOutput();
+}
+
+void flushOutput() {
+  if (std::fflush(stdout) == 0 && std::ferror(stdout) == 0) return;
+  throw Failure(ExitCode::Failed, std::string("cannot write to standard output: ") + std::strerror(errno));
+}
+
+}  // namespace zorva::cli
