@@ -1,24 +1,23 @@
 #include <cstdio>
 #include <exception>
-#include <variant>
 
 #include "agent/Agent.h"
-#include "cli/commands/Arguments.h"
+#include "cli/commands/Commands.h"
+#include "cli/output/Console.h"
 #include "cli/output/Failure.h"
-#include "cli/session/Session.h"
 
 namespace {
 
 using namespace zorva::cli;
 
 ExitCode run(int argc, const char* const* argv) {
-  const auto read = readArguments(argc, argv);
-  if (const auto* telling = std::get_if<Telling>(&read)) {
+  CommandLine line;
+  addCommands(line);
+  if (const auto telling = line.read(argc, argv)) {
     if (telling->isError) throw Failure(ExitCode::WrongUsage, telling->text, telling->hint);
     write(telling->text);
   } else {
-    const auto& invocation = std::get<Invocation>(read);
-    invocation.command(invocation.arguments);
+    line.run();
   }
   flushOutput();
   return ExitCode::Done;

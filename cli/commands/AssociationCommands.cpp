@@ -11,6 +11,15 @@ namespace zorva::cli {
 
 namespace {
 
+struct AssociationOptions {
+  std::string path;  ///< of the near end
+  std::string associationClass;
+  std::string resultClass;
+  std::string role;
+  std::string resultRole;
+  std::vector<std::string> properties;  ///< of those wanted; empty: all
+};
+
 std::string endsOf(const schema::Class& association) {
   std::vector<std::string> ends;
   for (const schema::ClassProperty* each : association.references()) {
@@ -34,15 +43,15 @@ void requireRole(const char* option, const std::string& role, const std::vector<
 
 /// The filter of the command line, its class names tested and in the schema's spelling. What the options of references
 /// call the result class is the association itself.
-broker::AssociationFilter filterOf(Session& session, const Arguments& arguments) {
+broker::AssociationFilter filterOf(Session& session, const AssociationOptions& options) {
   const auto spelled = [&session](const std::string& name) {
     return name.empty() ? name : session.classNamed(name).name();
   };
   broker::AssociationFilter filter;
-  filter.associationClass = spelled(arguments.associationClass);
-  filter.resultClass = spelled(arguments.resultClass);
-  filter.role = arguments.role;
-  filter.resultRole = arguments.resultRole;
+  filter.associationClass = spelled(options.associationClass);
+  filter.resultClass = spelled(options.resultClass);
+  filter.role = options.role;
+  filter.resultRole = options.resultRole;
   return filter;
 }
 
@@ -73,17 +82,17 @@ using Operation = std::function<broker::Status(Operations& cim, const broker::Ob
                                                const broker::Selection& selection, ResultWriter& writer)>;
 
 /// `top` is the class that the results are of, as the command line has it.
-void follow(const Arguments& arguments, Results results, const char* what, const std::string& top,
-            const Operation& operation) {
-  Session session(arguments);
-  const auto writer = makeResultWriter(arguments.output, session.layout(), Count::Many, results);
-  const broker::AssociationFilter filter = filterOf(session, arguments);
-  const broker::Selection selection = selectionOf(session, arguments, session.classes()->find(top));
-  const broker::ObjectPath path = resolvePath(session, arguments.target);
+void follow(const Globals& globals, const AssociationOptions& options, Results results, const char* what,
+            const std::string& top, const Operation& operation) {
+  Session session(globals);
+  const auto writer = makeResultWriter(globals.output, session.layout(), Count::Many, results);
+  const broker::AssociationFilter filter = filterOf(session, options);
+  const broker::Selection selection = selectionOf(session, options.properties, session.classes()->find(top));
+  const broker::ObjectPath path = resolvePath(session, options.path);
   requireAnAssociation(session, path, filter);
   const broker::Status status = operation(session.cim(), path, filter, selection, *writer);
   writer->finish();
-  requireDone(std::string(what) + " of " + arguments.target, status);
+  requireDone(std::string(what) + " of " + options.path, status);
 }
 
 template <class Result>
@@ -94,34 +103,87 @@ auto into(ResultWriter& writer) {
   };
 }
 
-}  // namespace
-
-void showAssociators(const Arguments& arguments) {
-  follow(arguments, Results::Instances, "associators", arguments.resultClass,
+void showAssociators(const Globals& globals, const AssociationOptions& options) {
+  follow(globals, options, Results::Instances, "associators", options.resultClass,
          [](auto& cim, const auto& path, const auto& filter, const auto& selection, ResultWriter& writer) {
            return cim.associators(path, filter, selection, into<broker::Instance>(writer));
          });
 }
 
-void showAssociatorNames(const Arguments& arguments) {
-  follow(arguments, Results::Names, "associator names", {},
+void showAssociatorNames(const Globals& globals, const AssociationOptions& options) {
+  follow(globals, options, Results::Names, "associator names", {},
          [](auto& cim, const auto& path, const auto& filter, const auto&, ResultWriter& writer) {
            return cim.associatorNames(path, filter, into<broker::ObjectPath>(writer));
          });
 }
 
-void showReferences(const Arguments& arguments) {
-  follow(arguments, Results::Instances, "references", arguments.associationClass,
+void showReferences(const Globals& globals, const AssociationOptions& options) {
+  follow(globals, options, Results::Instances, "references", options.associationClass,
          [](auto& cim, const auto& path, const auto& filter, const auto& selection, ResultWriter& writer) {
            return cim.references(path, filter, selection, into<broker::Instance>(writer));
          });
 }
 
-void showReferenceNames(const Arguments& arguments) {
-  follow(arguments, Results::Names, "reference names", {},
+void showReferenceNames(const Globals& globals, const AssociationOptions& options) {
+  follow(globals, options, Results::Names, "reference names", {},
          [](auto& cim, const auto& path, const auto& filter, const auto&, ResultWriter& writer) {
            return cim.referenceNames(path, filter, into<broker::ObjectPath>(writer));
          });
+}
+
+void addFarEnd(Subcommand& subcommand, AssociationOptions& options) {
+  subcommand.option("--assoc-class", "CLASS", "Only through this association", options.associationClass)
+      .option("--result-class", "CLASS", "Only objects of this class", options.resultClass)
+      .option("--result-role", "ROLE", "Only where the far end stands at this reference", options.resultRole);
+}
+
+void addAssociation(Subcommand& subcommand, AssociationOptions& options) {
+  subcommand.option("--result-class,--assoc-class", "CLASS", "Only associations of this class",
+                    options.associationClass);
+}
+
+struct Naming {
+  const char* name;
+  const char* alias;
+  const char* description;
+};
+
+/// Registers one of the four; `addFilter` adds the options that it does not share with all of them.
+Subcommand addOne(CommandLine& line, const Naming& naming, Results results,
+                  void (*addFilter)(Subcommand& subcommand, AssociationOptions& options),
+                  void (*command)(const Globals& globals, const AssociationOptions& options)) {
+  const auto options = std::make_shared<AssociationOptions>();
+  Subcommand subcommand = line.add(naming.name, naming.description);
+  subcommand.alias(naming.alias)
+      .writes({OutputFormat::Table, OutputFormat::Json})
+      .word("PATH", "The object path at the near end", options->path)
+      .option("--role", "ROLE", "Only where the near end stands at this reference", options->role);
+  addFilter(subcommand, *options);
+  if (results == Results::Instances) {
+    subcommand.writes({OutputFormat::Table, OutputFormat::Json, OutputFormat::Mof, OutputFormat::Xml})
+        .repeatable("--property", "PROPERTY", "Only this property; may be repeated", options->properties);
+  }
+  subcommand.runs<AssociationOptions>(command, options);
+  return subcommand;
+}
+
+}  // namespace
+
+void addAssociationCommands(CommandLine& line) {
+  addOne(line, {"associators", "ai", "The objects that an object is associated with"}, Results::Instances, addFarEnd,
+         showAssociators)
+      .examples(
+          "  zorvactl ai 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' --result-class CIM_RemoteServiceAccessPoint\n"
+          "  zorvactl ai 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' --assoc-class ZORVA_DNSEndPointElementSettingData");
+  addOne(line, {"associator-names", "ain", "Their names"}, Results::Names, addFarEnd, showAssociatorNames)
+      .examples(
+          "  zorvactl ain 'ZORVA_DNSSettingData.InstanceID=\"Computer%eth0\"'\n"
+          "  zorvactl ain 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' --role Dependent --result-role Antecedent");
+  addOne(line, {"references", "ri", "The associations of an object"}, Results::Instances, addAssociation,
+         showReferences)
+      .examples("  zorvactl ri 'ZORVA_RemoteServiceAccessPoint.Name=\"192.0.2.53\"'");
+  addOne(line, {"reference-names", "rin", "Their names"}, Results::Names, addAssociation, showReferenceNames)
+      .examples("  zorvactl rin 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' --result-class ZORVA_DNSHostedAccessPoint");
 }
 
 }  // namespace zorva::cli

@@ -2,6 +2,7 @@
 #include <algorithm>
 
 #include "cli/commands/Commands.h"
+#include "cli/output/Console.h"
 #include "cli/output/Failure.h"
 #include "cli/output/JsonOutput.h"
 #include "cli/output/ResultWriter.h"
@@ -16,6 +17,18 @@
 namespace zorva::cli {
 
 namespace {
+
+struct ModifyOptions {
+  std::string path;
+  std::vector<std::string> values;  ///< "NAME=VALUE"
+  ChangeOptions change;
+};
+
+struct InvokeOptions {
+  std::string path;
+  std::string method;
+  std::vector<std::string> values;  ///< "NAME=VALUE"
+};
 
 template <class Element>
 std::string namesOf(const std::vector<Element>& elements) {
@@ -73,34 +86,32 @@ std::string methodTable(const broker::MethodResult& result, const Layout& layout
   return table.text(layout);
 }
 
-}  // namespace
-
-void modifyInstance(const Arguments& arguments) {
-  requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "modify");
-  Session session(arguments);
-  const std::vector<Assignment> assignments = parseAssignments(arguments.values);
-  const broker::ObjectPath path = resolvePath(session, arguments.target);
+void modifyInstance(const Globals& globals, const ModifyOptions& options) {
+  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "modify");
+  Session session(globals);
+  const std::vector<Assignment> assignments = parseAssignments(options.values);
+  const broker::ObjectPath path = resolvePath(session, options.path);
   const schema::Class& declared = session.classNamed(path.className);
   std::vector<broker::Property> changes;
   changes.reserve(assignments.size());
   for (const Assignment& assignment : assignments) changes.push_back(parseChange(declared, assignment));
 
-  const ChangeOptions options{arguments.only, arguments.dryRun};
-  const Session::Changing alone(session, options.dryRun);
-  const broker::Instance instance = changeInstance(session, path, changes, options);
-  if (arguments.output == OutputFormat::Json) {
+  const ChangeOptions& change = options.change;
+  const Session::Changing alone(session, change.dryRun);
+  const broker::Instance instance = changeInstance(session, path, changes, change);
+  if (globals.output == OutputFormat::Json) {
     write(instanceJson(instance, 0) + "\n");
   } else {
-    writeChanges(session, instance, changes, options);
+    writeChanges(session, instance, changes, change);
   }
 }
 
-void invokeMethod(const Arguments& arguments) {
-  requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "invoke");
-  Session session(arguments);
-  const std::vector<Assignment> assignments = parseAssignments(arguments.values);
-  const broker::ObjectPath path = resolvePath(session, arguments.target);
-  const schema::ClassMethod& method = methodNamed(session.classNamed(path.className), arguments.method);
+void invokeMethod(const Globals& globals, const InvokeOptions& options) {
+  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "invoke");
+  Session session(globals);
+  const std::vector<Assignment> assignments = parseAssignments(options.values);
+  const broker::ObjectPath path = resolvePath(session, options.path);
+  const schema::ClassMethod& method = methodNamed(session.classNamed(path.className), options.method);
   std::vector<broker::NamedValue> input;
   input.reserve(assignments.size());
   for (const Assignment& assignment : assignments) input.push_back(parseParameter(method, assignment));
@@ -108,8 +119,7 @@ void invokeMethod(const Arguments& arguments) {
   broker::MethodResult result;
   const broker::Status status = session.cim().invokeMethod(path, method.name, input, result);
   if (!status.ok()) throw operationFailure(method.name + " of " + shortPathText(path), status, parametersOf(method));
-  write(arguments.output == OutputFormat::Json ? methodResultJson(result) + "\n"
-                                               : methodTable(result, session.layout()));
+  write(globals.output == OutputFormat::Json ? methodResultJson(result) + "\n" : methodTable(result, session.layout()));
   if (path.className == kEndpointClass) {
     tellNote(method.name +
              " checks and answers, and changes nothing; 'zorvactl dns', 'domain', 'suffixes' and 'modify' do");
@@ -117,6 +127,38 @@ void invokeMethod(const Arguments& arguments) {
   if (const std::string value = valueText(result.returnValue, nullptr); value != "0" && !result.returnValue.isNull) {
     throw Failure(ExitCode::Failed, method.name + " returned " + value);
   }
+}
+
+}  // namespace
+
+void addModifyCommand(CommandLine& line) {
+  const auto options = std::make_shared<ModifyOptions>();
+  line.add("modify", "Change properties of an instance")
+      .alias("mi")
+      .writes({OutputFormat::Table, OutputFormat::Json})
+      .examples(
+          "  zorvactl modify 'ZORVA_DNSSettingData.InstanceID=\"Computer%eth0\"' DomainName=lab.example.org\n"
+          "  zorvactl modify 'ZORVA_DNSSettingData.InstanceID=\"Computer%eth0\"' \\\n"
+          "    DNSServerAddresses=192.0.2.1 DNSServerAddresses=192.0.2.2\n"
+          "  zorvactl modify 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' DomainName=node.example.org --dry-run")
+      .word("PATH", "Its object path", options->path)
+      .words("NAME=VALUE", "A property; repeat its name for an array, NAME= empties it, NAME=null is CIM's NULL",
+             Many::Some, options->values, "PROPERTY=")
+      .flag("--only", "Send these properties alone, and not the others as they were read", options->change.only)
+      .flag("--dry-run", "Show what would be sent, and send nothing", options->change.dryRun)
+      .runs<ModifyOptions>(modifyInstance, options);
+}
+
+void addInvokeCommand(CommandLine& line) {
+  const auto options = std::make_shared<InvokeOptions>();
+  line.add("invoke", "Call a method of an instance")
+      .alias("cm")
+      .writes({OutputFormat::Table, OutputFormat::Json})
+      .examples("  zorvactl invoke 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' SetDNSDomain DNSDomain=x.example.org")
+      .word("PATH", "Its object path", options->path)
+      .word("METHOD", "The method", options->method)
+      .words("NAME=VALUE", "A parameter; repeat its name for an array", Many::Any, options->values, "PARAMETER=")
+      .runs<InvokeOptions>(invokeMethod, options);
 }
 
 }  // namespace zorva::cli

@@ -2,6 +2,7 @@
 #include <algorithm>
 
 #include "cli/commands/Commands.h"
+#include "cli/output/Console.h"
 #include "cli/session/Session.h"
 
 namespace zorva::cli {
@@ -79,8 +80,8 @@ void addNamesOf(const schema::ClassRepository& classes, const std::vector<std::s
   }
 }
 
-void addInterfaces(const Arguments& arguments, std::vector<std::string>& words) {
-  const Session session(arguments);
+void addInterfaces(const Globals& globals, std::vector<std::string>& words) {
+  const Session session(globals);
   for (const zorva::agent::Node& node : session.tree()->nodes()) {
     const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
     if (name != nullptr) words.push_back(*name);
@@ -91,16 +92,16 @@ bool begins(const std::string& word, const std::string& begun) {
   return word.size() >= begun.size() && util::sameName(std::string_view(word).substr(0, begun.size()), begun);
 }
 
-Completion completionOf(const Arguments& arguments, const std::vector<std::string>& before) {
-  Completion completion = completionBehind(before);
+Completion completionOf(const CommandLine& line, const Globals& globals, const std::vector<std::string>& before) {
+  Completion completion = line.completionAfter(before);
   if (completion.kind == "INTERFACE") {
     // Another host's are not known here.
     const bool isHere = std::none_of(before.begin(), before.end(), [](const std::string& word) {
       return word == "--url" || word.starts_with("--url=");
     });
-    if (isHere) addInterfaces(arguments, completion.words);
+    if (isHere) addInterfaces(globals, completion.words);
   } else if (!completion.kind.empty()) {
-    Session session(arguments);
+    Session session(globals);
     if (completion.kind == "CLASS" || completion.kind == "PATH") {
       for (const schema::Class* each : session.classes()->classes()) completion.words.push_back(each->name());
     } else {
@@ -110,12 +111,10 @@ Completion completionOf(const Arguments& arguments, const std::vector<std::strin
   return completion;
 }
 
-}  // namespace
+void writeCompletion(const Globals& /*globals*/) { write(kBashScript); }
 
-void writeCompletion(const Arguments&) { write(kBashScript); }
-
-void completeWords(const Arguments& arguments) {
-  std::vector<std::string> words = joinedWords(arguments.values);
+void completeWords(const CommandLine& line, const Globals& globals, const std::vector<std::string>& typed) {
+  std::vector<std::string> words = joinedWords(typed);
   if (words.empty()) return;
   std::string begun = std::move(words.back());
   words.pop_back();
@@ -125,11 +124,26 @@ void completeWords(const Arguments& arguments) {
     words.push_back(begun.substr(0, equals));
     begun.erase(0, equals + 1);
   }
-  for (const std::string& word : completionOf(arguments, words).words) {
+  for (const std::string& word : completionOf(line, globals, words).words) {
     // Options only where one is begun: there are more of them than of all else.
     const bool isWanted = word.starts_with("-") == begun.starts_with("-");
     if (isWanted && begins(word, begun)) write(printable(word) + "\n");
   }
+}
+
+}  // namespace
+
+void addCompletionCommands(CommandLine& line) {
+  line.add("completion", "Print the completion script of a shell")
+      .examples("  source <(zorvactl completion bash)            in ~/.bashrc")
+      .choice("SHELL", "bash", {"bash"})
+      .runs(writeCompletion);
+
+  // For that script alone.
+  const auto words = std::make_shared<std::vector<std::string>>();
+  line.add("complete", "").hidden().words("WORD", "", Many::Any, *words).runs([&line, words](const Globals& globals) {
+    completeWords(line, globals, *words);
+  });
 }
 
 }  // namespace zorva::cli

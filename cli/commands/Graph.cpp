@@ -6,6 +6,7 @@
 #include <unordered_map>
 #include <unordered_set>
 
+#include "cli/output/Console.h"
 #include "cli/output/Failure.h"
 #include "cli/output/Text.h"
 #include "cli/output/ValueText.h"

@@ -10,8 +10,9 @@
 
 #include "cli/commands/Commands.h"
 #include "cli/commands/Graph.h"
+#include "cli/commands/ViewJson.h"
+#include "cli/output/Console.h"
 #include "cli/output/Failure.h"
-#include "cli/output/JsonOutput.h"
 #include "cli/output/ResultWriter.h"
 #include "cli/session/Paths.h"
 #include "cli/session/Session.h"
@@ -22,6 +23,11 @@ extern char** environ;
 namespace zorva::cli {
 
 namespace {
+
+struct GraphOptions {
+  std::string path;  ///< of the object where it begins; empty: all
+  bool all = false;  ///< whatever time it takes
+};
 
 /// Starts Graphviz's dot with its input at `input`; its output is that of this process.
 pid_t startDot(int input) {
@@ -67,28 +73,26 @@ void writeSvg(const std::string& dot) {
   }
 }
 
-Graph graphOf(Session& session, const Arguments& arguments) {
+Graph graphOf(Session& session, const GraphOptions& options) {
   Progress progress;
   const std::vector<broker::ObjectPath> roots =
-      arguments.target.empty() ? allObjects(session, progress)
-                               : std::vector<broker::ObjectPath>{resolvePath(session, arguments.target)};
-  return walkGraph(session, progress, roots, arguments.all);
+      options.path.empty() ? allObjects(session, progress)
+                           : std::vector<broker::ObjectPath>{resolvePath(session, options.path)};
+  return walkGraph(session, progress, roots, options.all);
 }
 
-}  // namespace
-
-void showGraph(const Arguments& arguments) {
-  requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json, OutputFormat::Dot, OutputFormat::Svg},
+void showGraph(const Globals& globals, const GraphOptions& options) {
+  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json, OutputFormat::Dot, OutputFormat::Svg},
                 "graph");
-  Session session(arguments);
+  Session session(globals);
   const Session::Quiet quiet(session);
-  const Graph graph = graphOf(session, arguments);
+  const Graph graph = graphOf(session, options);
   if (graph.notFollowed != 0) {
     tellNote(
         "of this many objects " + std::to_string(graph.notFollowed) +
         " were not asked for their associations; graph PATH begins at one of them, --all asks all, which takes long");
   }
-  switch (arguments.output) {
+  switch (globals.output) {
     case OutputFormat::Json:
       write(graphJson(graph) + "\n");
       return;
@@ -101,6 +105,21 @@ void showGraph(const Arguments& arguments) {
     default:
       write(graphText(graph, session.layout()));
   }
+}
+
+}  // namespace
+
+void addGraphCommand(CommandLine& line) {
+  const auto options = std::make_shared<GraphOptions>();
+  line.add("graph", "The objects and how they are associated")
+      .writes({OutputFormat::Table, OutputFormat::Json, OutputFormat::Dot, OutputFormat::Svg})
+      .examples(
+          "  zorvactl graph\n"
+          "  zorvactl graph 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"'\n"
+          "  zorvactl graph --output svg > dns.svg         needs Graphviz")
+      .optionalWord("PATH", "Begin at this object; without it, all are shown", options->path)
+      .flag("--all", "Follow all objects of a host with very many interfaces, too; takes long", options->all)
+      .runs<GraphOptions>(showGraph, options);
 }
 
 }  // namespace zorva::cli

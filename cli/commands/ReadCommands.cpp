@@ -8,10 +8,17 @@
 
 namespace zorva::cli {
 
-void enumerateNames(const Arguments& arguments) {
-  Session session(arguments);
-  const broker::ObjectPath wanted = resolveClass(session, arguments.target);
-  const auto writer = makeResultWriter(arguments.output, session.layout(), Count::Many, Results::Names);
+namespace {
+
+struct ReadOptions {
+  std::string target;                   ///< a class, or the path of an instance
+  std::vector<std::string> properties;  ///< of those wanted; empty: all
+};
+
+void enumerateNames(const Globals& globals, const ReadOptions& options) {
+  Session session(globals);
+  const broker::ObjectPath wanted = resolveClass(session, options.target);
+  const auto writer = makeResultWriter(globals.output, session.layout(), Count::Many, Results::Names);
   const broker::Status status =
       session.cim().enumerateInstanceNames(wanted.nameSpace, wanted.className, [&](const broker::ObjectPath& path) {
         writer->add(path);
@@ -21,11 +28,11 @@ void enumerateNames(const Arguments& arguments) {
   requireDone("enumerating the names of " + wanted.className, status);
 }
 
-void enumerateInstances(const Arguments& arguments) {
-  Session session(arguments);
-  const broker::ObjectPath wanted = resolveClass(session, arguments.target);
-  const broker::Selection selection = selectionOf(session, arguments, &session.classNamed(wanted.className));
-  const auto writer = makeResultWriter(arguments.output, session.layout(), Count::Many, Results::Instances);
+void enumerateInstances(const Globals& globals, const ReadOptions& options) {
+  Session session(globals);
+  const broker::ObjectPath wanted = resolveClass(session, options.target);
+  const broker::Selection selection = selectionOf(session, options.properties, &session.classNamed(wanted.className));
+  const auto writer = makeResultWriter(globals.output, session.layout(), Count::Many, Results::Instances);
   const broker::Status status = session.cim().enumerateInstances(wanted.nameSpace, wanted.className, selection,
                                                                  [&](const broker::Instance& instance) {
                                                                    writer->add(instance);
@@ -35,18 +42,54 @@ void enumerateInstances(const Arguments& arguments) {
   requireDone("enumerating " + wanted.className, status);
 }
 
-void getInstance(const Arguments& arguments) {
-  Session session(arguments);
-  const auto writer = makeResultWriter(arguments.output, session.layout(), Count::One, Results::Instances);
-  const broker::ObjectPath path = resolvePath(session, arguments.target);
-  const broker::Selection selection = selectionOf(session, arguments, &session.classNamed(path.className));
+void getInstance(const Globals& globals, const ReadOptions& options) {
+  Session session(globals);
+  const auto writer = makeResultWriter(globals.output, session.layout(), Count::One, Results::Instances);
+  const broker::ObjectPath path = resolvePath(session, options.target);
+  const broker::Selection selection = selectionOf(session, options.properties, &session.classNamed(path.className));
   broker::Instance instance;
   const broker::Status status = session.cim().getInstance(path, selection, instance);
   if (!status.ok()) {
-    throw operationFailure(arguments.target, status, "zorvactl names " + path.className + " lists what there is");
+    throw operationFailure(options.target, status, "zorvactl names " + path.className + " lists what there is");
   }
   writer->add(instance);
   writer->finish();
+}
+
+}  // namespace
+
+void addReadCommands(CommandLine& line) {
+  auto options = std::make_shared<ReadOptions>();
+  line.add("enumerate", "All instances of a class")
+      .alias("ei")
+      .writes({OutputFormat::Table, OutputFormat::Json, OutputFormat::Mof, OutputFormat::Xml})
+      .examples(
+          "  zorvactl ei ZORVA_DNSProtocolEndPoint\n"
+          "  zorvactl ei ZORVA_DNSSettingData --property DomainName --property DNSServerAddresses --output json\n"
+          "  zorvactl ei CIM_SettingData                   and of all classes below it")
+      .word("CLASS", "The class, or one above it", options->target)
+      .repeatable("--property", "PROPERTY", "Only this property; may be repeated", options->properties)
+      .runs<ReadOptions>(enumerateInstances, options);
+
+  options = std::make_shared<ReadOptions>();
+  line.add("names", "The names of all instances of a class")
+      .alias("ein")
+      .writes({OutputFormat::Table, OutputFormat::Json})
+      .examples("  zorvactl ein ZORVA_DNSSettingData")
+      .word("CLASS", "The class, or one above it", options->target)
+      .runs<ReadOptions>(enumerateNames, options);
+
+  options = std::make_shared<ReadOptions>();
+  line.add("get", "One instance")
+      .alias("gi")
+      .writes({OutputFormat::Table, OutputFormat::Json, OutputFormat::Mof, OutputFormat::Xml})
+      .examples(
+          "  zorvactl gi 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"'\n"
+          "  zorvactl gi 'ZORVA_DNSSettingData.InstanceID=\"Computer%eth0\"' --output mof\n"
+          "  zorvactl gi ZORVA_DNSGeneralSettingData       the only one needs no keys")
+      .word("PATH", "Its object path", options->target)
+      .repeatable("--property", "PROPERTY", "Only this property; may be repeated", options->properties)
+      .runs<ReadOptions>(getInstance, options);
 }
 
 }  // namespace zorva::cli

@@ -2,7 +2,8 @@
 #include <string>
 
 #include "cli/commands/Commands.h"
-#include "cli/output/JsonOutput.h"
+#include "cli/commands/ViewJson.h"
+#include "cli/output/Console.h"
 #include "cli/output/ResultWriter.h"
 #include "cli/output/Text.h"
 #include "cli/session/HostView.h"
@@ -11,6 +12,10 @@
 namespace zorva::cli {
 
 namespace {
+
+struct CountOptions {
+  bool all = false;  ///< whatever time it takes
+};
 
 std::string orDash(const std::string& text) { return text.empty() ? "-" : text; }
 
@@ -91,14 +96,12 @@ std::vector<ClassRow> classesOf(Session& session, bool countsAll) {
   return readClassRows(session, progress, countsAll);
 }
 
-}  // namespace
-
-void showHost(const Arguments& arguments) {
-  requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "show");
-  Session session(arguments);
-  const HostView view = viewOf(session, arguments.all);
+void showHost(const Globals& globals, const CountOptions& options) {
+  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "show");
+  Session session(globals);
+  const HostView view = viewOf(session, options.all);
   tellUncounted(view.classes);
-  if (arguments.output == OutputFormat::Json) {
+  if (globals.output == OutputFormat::Json) {
     write(hostViewJson(view) + "\n");
     return;
   }
@@ -115,17 +118,41 @@ void showHost(const Arguments& arguments) {
   for (const Problem& problem : view.problems) tellWarning(problemText(problem));
 }
 
-void listClasses(const Arguments& arguments) {
-  requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "classes");
-  Session session(arguments);
-  const std::vector<ClassRow> rows = classesOf(session, arguments.all);
+void listClasses(const Globals& globals, const CountOptions& options) {
+  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "classes");
+  Session session(globals);
+  const std::vector<ClassRow> rows = classesOf(session, options.all);
   tellUncounted(rows);
-  if (arguments.output == OutputFormat::Json) {
+  if (globals.output == OutputFormat::Json) {
     write(classRowsJson(rows) + "\n");
     return;
   }
   write(classTable(rows).text(session.layout()));
   for (const Problem& problem : problemsOf(rows)) tellWarning(problemText(problem));
+}
+
+void registerCounting(Subcommand& subcommand, void (*command)(const Globals& globals, const CountOptions& options)) {
+  const auto options = std::make_shared<CountOptions>();
+  subcommand.writes({OutputFormat::Table, OutputFormat::Json})
+      .flag("--all", "Count the associations of a host with very many interfaces, too; takes long", options->all)
+      .runs<CountOptions>(command, options);
+}
+
+}  // namespace
+
+void addShowCommand(CommandLine& line) {
+  Subcommand show = line.add("show", "The endpoints, servers and settings of this host at a glance");
+  show.examples(
+      "  zorvactl show\n"
+      "  zorvactl show --output json\n"
+      "  zorvactl show --url http://localhost:5988/root/cimv2");
+  registerCounting(show, showHost);
+}
+
+void addClassesCommand(CommandLine& line) {
+  Subcommand classes = line.add("classes", "The classes with their providers and instance counts");
+  classes.examples("  zorvactl classes");
+  registerCounting(classes, listClasses);
 }
 
 }  // namespace zorva::cli

@@ -4,6 +4,7 @@
 
 #include "agent/Agent.h"
 #include "cli/commands/Commands.h"
+#include "cli/output/Console.h"
 #include "cli/output/ResultWriter.h"
 #include "cli/output/Text.h"
 #include "cli/output/TreeText.h"
@@ -11,12 +12,25 @@
 
 namespace zorva::cli {
 
-void showTree(const Arguments& arguments) {
-  requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, "tree");
-  requireLocal(arguments, "tree");
-  const Session session(arguments);
+namespace {
+
+void showTree(const Globals& globals) {
+  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "tree");
+  requireLocal(globals, "tree");
+  const Session session(globals);
   const std::shared_ptr<const zorva::agent::TreeSnapshot> tree = session.tree();
-  write(arguments.output == OutputFormat::Json ? zorva::agent::treeToJson(*tree) : treeText(*tree, session.layout()));
+  write(globals.output == OutputFormat::Json ? zorva::agent::treeToJson(*tree) : treeText(*tree, session.layout()));
+}
+
+}  // namespace
+
+void addTreeCommand(CommandLine& line) {
+  line.add("tree", "The agent's instrumentation tree")
+      .writes({OutputFormat::Table, OutputFormat::Json})
+      .examples(
+          "  zorvactl tree\n"
+          "  zorvactl tree --output json > tree.json       to be read back as [tree] source = \"file\"")
+      .runs(showTree);
 }
 
 }  // namespace zorva::cli

@@ -4,12 +4,12 @@
 #include <string>
 
 #include "cimxml/ElementWriter.h"
+#include "cli/output/Console.h"
 #include "cli/output/Failure.h"
 #include "cli/output/JsonOutput.h"
 #include "cli/output/MofOutput.h"
 #include "cli/output/Text.h"
 #include "cli/output/ValueText.h"
-#include "cli/session/Session.h"
 
 namespace zorva::cli {
 

@@ -3,7 +3,7 @@
 #include <memory>
 
 #include "broker/objects/Value.h"
-#include "cli/commands/Arguments.h"
+#include "cli/output/OutputFormat.h"
 #include "cli/output/Table.h"
 
 // What a CIM operation gives, on standard output, in the format that was asked for. Results go out one by one, so that

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <optional>
 
+#include "cli/output/Console.h"
 #include "cli/output/Failure.h"
 #include "cli/output/Table.h"
 #include "cli/output/Text.h"

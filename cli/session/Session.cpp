@@ -3,16 +3,13 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <cerrno>
-#include <cstdio>
-#include <cstring>
 #include <vector>
 
 #include "agent/Agent.h"
 #include "cli/operations/LocalOperations.h"
 #include "cli/operations/RemoteOperations.h"
+#include "cli/output/Console.h"
 #include "cli/output/Failure.h"
-#include "cli/output/Progress.h"
 #include "cli/output/Text.h"
 #include "schema/Schema.h"
 #include "util/LogLevels.h"
@@ -35,13 +32,6 @@ std::string similarNames(const schema::ClassRepository& classes, std::string_vie
   }
   if (similar.empty()) return "zorvactl classes lists them";
   return "is it " + joined(similar, ", ") + "?";
-}
-
-void tell(const char* kind, std::string_view what) {
-  std::fflush(stdout);
-  Progress::makeRoom();
-  const std::string line = std::string("zorvactl: ") + kind + std::string(what) + "\n";
-  std::fwrite(line.data(), 1, line.size(), stderr);
 }
 
 /// Passes over what the providers log, and tells the agent's own lines.
@@ -86,17 +76,17 @@ class Finally {
 
 }  // namespace
 
-Session::Session(const Arguments& arguments)
+Session::Session(const Globals& globals)
     : layout_(Layout::ofStandardOutput()),
-      url_(arguments.url),
-      logLevel_(arguments.logLevel.value_or(util::kLevelError)),
-      wantsLog_(arguments.logLevel.has_value()),
-      providerDirectory_(arguments.providerDirectory) {
+      url_(globals.url),
+      logLevel_(globals.logLevel.value_or(util::kLevelError)),
+      wantsLog_(globals.logLevel.has_value()),
+      providerDirectory_(globals.providerDirectory) {
   if (isRemote()) return;
   asFailure([&] {
-    zorva::agent::loadConfig(arguments.config);
-    if (arguments.logLevel) zorva::agent::setLogLevel(zorva::agent::LogStream::Log, *arguments.logLevel);
-    if (!arguments.logLevel) logLevel_ = zorva::agent::currentConfig().logLevel;
+    zorva::agent::loadConfig(globals.config);
+    if (globals.logLevel) zorva::agent::setLogLevel(zorva::agent::LogStream::Log, *globals.logLevel);
+    if (!globals.logLevel) logLevel_ = zorva::agent::currentConfig().logLevel;
   });
 }
 
@@ -184,18 +174,18 @@ bool Session::isThisHost(std::string_view name) const {
          util::sameName(name, zorva::agent::currentConfig().systemName);
 }
 
-void requireLocal(const Arguments& arguments, const char* subcommand) {
-  if (arguments.url.empty()) return;
+void requireLocal(const Globals& globals, const char* subcommand) {
+  if (globals.url.empty()) return;
   throw Failure(ExitCode::WrongUsage,
                 std::string("zorvactl ") + subcommand + " is about files of this host, which no CIM server hands out",
                 "leave out --url, and run it on the host that is meant");
 }
 
-broker::Selection selectionOf(Session& session, const Arguments& arguments, const schema::Class* top) {
+broker::Selection selectionOf(Session& session, const std::vector<std::string>& properties, const schema::Class* top) {
   broker::Selection selection;
-  if (arguments.properties.empty()) return selection;
+  if (properties.empty()) return selection;
   const std::vector<const schema::Class*>& classes = session.classes()->classes();
-  for (const std::string& property : arguments.properties) {
+  for (const std::string& property : properties) {
     const auto hasIt = [&](const schema::Class* each) {
       return (top == nullptr || each->isA(*top)) && each->findProperty(property) != nullptr;
     };
@@ -205,26 +195,8 @@ broker::Selection selectionOf(Session& session, const Arguments& arguments, cons
                       " has a property " + printable(property),
                   "the same command without --property shows what there is");
   }
-  selection.propertyList = arguments.properties;
+  selection.propertyList = properties;
   return selection;
-}
-
-void tellError(std::string_view what, std::string_view hint) {
-  tell("", what);
-  if (!hint.empty()) tell("", hint);
-}
-
-void tellWarning(std::string_view what) { tell("warning: ", what); }
-
-void tellNote(std::string_view what) { tell("note: ", what); }
-
-void write(std::string_view text) {
-  if (std::fwrite(text.data(), 1, text.size(), stdout) != text.size()) flushOutput();
-}
-
-void flushOutput() {
-  if (std::fflush(stdout) == 0 && std::ferror(stdout) == 0) return;
-  throw Failure(ExitCode::Failed, std::string("cannot write to standard output: ") + std::strerror(errno));
 }
 
 }  // namespace zorva::cli

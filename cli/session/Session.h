@@ -6,14 +6,15 @@
 #include <stdexcept>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "agent/config/Config.h"
 #include "agent/tree/TreeSnapshot.h"
-#include "cli/commands/Arguments.h"
 #include "cli/operations/Operations.h"
 #include "cli/output/Failure.h"
 #include "cli/output/Table.h"
 #include "cli/output/Text.h"
+#include "cli/session/Globals.h"
 #include "frontend/SettingsClaims.h"
 
 // One run of the program: the agent with its configuration, and who does the CIM operations, each set up when a command
@@ -25,7 +26,7 @@ class Session {
  public:
   /// Reads the agent's configuration, unless a server is to be asked. Throws Failure (wrong usage) where that is wrong,
   /// or where a log cannot be opened.
-  explicit Session(const Arguments& arguments);
+  explicit Session(const Globals& globals);
   Session(const Session&) = delete;
   Session& operator=(const Session&) = delete;
   ~Session();
@@ -98,7 +99,7 @@ class Session {
 };
 
 /// Throws Failure (wrong usage) where a server is to be asked: `subcommand` reads or writes files of this host.
-void requireLocal(const Arguments& arguments, const char* subcommand);
+void requireLocal(const Globals& globals, const char* subcommand);
 
 /// Does the work with what the agent throws turned into Failure: wrong files are the user's to mend, all else is a
 /// failure.
@@ -115,23 +116,8 @@ auto asFailure(Work work) {
   }
 }
 
-/// What of each instance the arguments want. Throws Failure (wrong usage) where neither `top` nor a class below it, or,
-/// without one, no class at all, has a property of such a name.
-broker::Selection selectionOf(Session& session, const Arguments& arguments, const schema::Class* top);
-
-/// The lines of an error on stderr: what, and what to do next.
-void tellError(std::string_view what, std::string_view hint = {});
-
-/// A line that tells what a person should know although the command was done.
-void tellWarning(std::string_view what);
-
-/// A line of the same kind that is no warning.
-void tellNote(std::string_view what);
-
-/// Writes to standard output. Throws Failure where that cannot be written.
-void write(std::string_view text);
-
-/// Writes what is still held back. Throws Failure as write does.
-void flushOutput();
+/// Of each instance only these properties; all of them where none is named. Throws Failure (wrong usage) where neither
+/// `top` nor a class below it, or, without one, no class at all, has a property of such a name.
+broker::Selection selectionOf(Session& session, const std::vector<std::string>& properties, const schema::Class* top);
 
 }  // namespace zorva::cli

@@ -1,0 +1,128 @@
+#pragma once
+
+#include <functional>
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+#include "cli/session/Globals.h"
+
+// The command line: the subcommands register themselves with their words and options, which then are read from argv.
+// Help, completion and the errors of wrong usage are made of what is registered.
+
+namespace CLI {
+class App;
+class Option;
+}  // namespace CLI
+
+namespace zorva::cli {
+
+/// Does what a subcommand is for, and writes to standard output. Throws Failure where it cannot.
+using Command = std::function<void(const Globals& globals)>;
+
+/// What is to be told instead of running a command: help, the version, or why the command line is wrong.
+struct Telling {
+  std::string text;
+  bool isError = false;
+  std::string hint = {};  ///< of an error: what to do next
+};
+
+/// What can stand at a place of the command line.
+struct Completion {
+  std::vector<std::string> words;  ///< subcommands, options, or the values of an option
+  /// What else can: "CLASS", "PATH", "INTERFACE", "METHOD", "PROPERTY", "ROLE", and with a "=" after them "PROPERTY="
+  /// and "PARAMETER="; of others there is no list.
+  std::string kind;
+};
+
+/// How many words may stand at the last place: any number; at least one; one.
+enum class Many { Any, Some, One };
+
+class CommandLine;
+
+/// A subcommand while it is registered. What it reads into must live as long as the command line.
+class Subcommand {
+ public:
+  /// A subcommand under this one, which then needs one.
+  Subcommand add(const std::string& name, const std::string& description);
+
+  Subcommand& alias(const std::string& name);
+
+  /// Neither help nor completion mention it.
+  Subcommand& hidden();
+
+  /// How it is called, a line each, for its help.
+  Subcommand& examples(std::string_view lines);
+
+  /// The formats that its help and completion list; without this, and for one format, help lists none.
+  Subcommand& writes(std::vector<OutputFormat> formats);
+
+  /// A word at a place of its own, which must be there: "PATH". Its name says what completes it.
+  Subcommand& word(const std::string& name, const std::string& description, std::string& into);
+  Subcommand& optionalWord(const std::string& name, const std::string& description, std::string& into);
+
+  /// The words at the last place. `kind` says what completes them, where `name` does not.
+  Subcommand& words(const std::string& name, const std::string& description, Many many, std::vector<std::string>& into,
+                    const std::string& kind = {});
+
+  /// A word that must be one of these.
+  Subcommand& choice(const std::string& name, const std::string& description, std::vector<std::string> choices);
+
+  /// An option with a value of this kind: "--role".
+  Subcommand& option(const std::string& name, const std::string& kind, const std::string& description,
+                     std::string& into);
+
+  /// An option that may be given several times.
+  Subcommand& repeatable(const std::string& name, const std::string& kind, const std::string& description,
+                         std::vector<std::string>& into);
+
+  Subcommand& flag(const std::string& name, const std::string& description, bool& into);
+
+  /// What is done where this subcommand is called.
+  Subcommand& runs(Command command);
+
+  /// The same with the options of its own, which the command line keeps alive.
+  template <class Options>
+  Subcommand& runs(void (*command)(const Globals&, const Options&), std::shared_ptr<const Options> options) {
+    return runs([command, options = std::move(options)](const Globals& globals) { command(globals, *options); });
+  }
+
+ private:
+  friend class CommandLine;
+  Subcommand(CommandLine& line, CLI::App& app) : line_(line), app_(app) {}
+
+  CommandLine& line_;
+  CLI::App& app_;
+};
+
+class CommandLine {
+ public:
+  CommandLine();
+  ~CommandLine();
+  CommandLine(const CommandLine&) = delete;
+  CommandLine& operator=(const CommandLine&) = delete;
+
+  /// Registers a subcommand. Help lists them in this order.
+  Subcommand add(const std::string& name, const std::string& description);
+
+  /// Reads the words; call it once, after all subcommands are registered. Nothing: a command is to be run.
+  std::optional<Telling> read(int argc, const char* const* argv);
+
+  const Globals& globals() const noexcept;
+
+  /// Runs the command that was read. Throws what that throws.
+  void run() const;
+
+  /// What can stand after these words.
+  Completion completionAfter(const std::vector<std::string>& words) const;
+
+ private:
+  friend class Subcommand;
+  struct Registered;
+  std::unique_ptr<Registered> registered_;
+};
+
+}  // namespace zorva::cli

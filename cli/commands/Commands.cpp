@@ -1,0 +1,14 @@
+#include "cli/commands/Commands.h"
+
+namespace zorva::cli {
+
+void addCommands(CommandLine& line) {
+  // Help lists them in this order.
+  for (const auto add : {addShowCommand, addTreeCommand, addClassesCommand, addGraphCommand, addReadCommands,
+                         addAssociationCommands, addModifyCommand, addInvokeCommand, addIfcfgCommands, addDnsCommands,
+                         addDomainCommand, addSuffixesCommands, addOverlayCommands, addCompletionCommands}) {
+    add(line);
+  }
+}
+
+}  // namespace zorva::cli

@@ -1,0 +1,70 @@
+// domain, suffixes: the domain of an interface, and those that the host appends.
+#include <ProviderUtilities.h>
+
+#include "cli/commands/Commands.h"
+#include "cli/commands/SettingList.h"
+#include "cli/output/ResultWriter.h"
+#include "cli/session/Assignments.h"
+#include "schema/Names.h"
+
+namespace zorva::cli {
+
+namespace {
+
+/// As the providers judge it, for a server might, too.
+bool isName(const std::string& text) { return ZV::ProviderUtilities::ValidateInput(text, {}) != 0; }
+
+constexpr const char* kNameRule =
+    "letters, digits, '-' and '_' between single dots, at most 63 in each part and 253 in all";
+
+void requireSuffix(const std::string& text) {
+  requirePlainText("SUFFIX", text);
+  if (text.empty() || !isName(text)) throw refused(text, "is no suffix", std::string("a suffix is ") + kNameRule);
+}
+
+bool sameSuffix(const std::string& a, const std::string& b) {
+  const auto plain = [](std::string_view text) { return text.substr(0, text.size() - (text.ends_with('.') ? 1 : 0)); };
+  return schema::sameName(plain(a), plain(b));
+}
+
+constexpr ListSetting kSuffixes{"suffixes", "DNSSuffixesToAppend", "suffix",  "SUFFIX", "A domain's name",
+                                false,      requireSuffix,         sameSuffix};
+
+void setDomain(const Globals& globals, const SettingOptions& options) {
+  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "domain");
+  const std::string& name = options.values.front();
+  requirePlainText("NAME", name);
+  if (!isName(name)) throw refused(name, std::string("is no domain name: it has ") + kNameRule);
+  Session session(globals);
+  const Session::Changing alone(session, options.dryRun);
+  const broker::Instance setting = settingOfInterface(session, options.interface);
+  changeSetting(session, globals, options, setting, "DomainName", broker::Value::text(name));
+}
+
+}  // namespace
+
+void addDomainCommand(CommandLine& line) {
+  const auto options = std::make_shared<SettingOptions>();
+  line.add("domain", "Set the DNS domain of an interface")
+      .writes({OutputFormat::Table, OutputFormat::Json})
+      .examples("  zorvactl domain eth0 lab.example.org\n  zorvactl domain eth0 ''")
+      .word("INTERFACE", "The interface's name", options->interface)
+      .flag("--dry-run", "Show what would be done, and do nothing", options->dryRun)
+      .words("NAME", "The domain's name; '' empties it", Many::One, options->values)
+      .runs<SettingOptions>(setDomain, options);
+}
+
+void addSuffixesCommands(CommandLine& line) {
+  Subcommand suffixes = line.add("suffixes", "The DNS suffixes of the host");
+  suffixes.writes({OutputFormat::Table, OutputFormat::Json})
+      .examples("  zorvactl suffixes set example.org example.net\n  zorvactl suffixes add lab.example.org");
+  addShow(suffixes, kSuffixes).examples("  zorvactl suffixes show");
+  addChange(suffixes, kSuffixes, "set", "Replace them; none at all empties the list", Many::Any, setList)
+      .examples("  zorvactl suffixes set example.org example.net");
+  addChange(suffixes, kSuffixes, "add", "Add suffixes behind the others", Many::Some, addToList)
+      .examples("  zorvactl suffixes add lab.example.org");
+  addChange(suffixes, kSuffixes, "remove", "Remove suffixes", Many::Some, removeFromList)
+      .examples("  zorvactl suffixes remove lab.example.org");
+}
+
+}  // namespace zorva::cli

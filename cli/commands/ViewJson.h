@@ -1,0 +1,32 @@
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "cli/commands/Graph.h"
+#include "cli/output/TreeText.h"
+#include "cli/session/HostView.h"
+#include "cli/session/SettingFile.h"
+
+// JSON documents (RFC 8259) of the views that commands make of what they read; laid out as those of
+// output/JsonOutput.h.
+
+namespace zorva::cli {
+
+/// What `show` shows.
+std::string hostViewJson(const HostView& view);
+
+/// The path and the lines of an interface's file: "file" and "lines", each with "key" and "value".
+std::string settingFileJson(const std::string& path, const std::vector<SettingLine>& lines);
+
+/// The values of the overlay: "node", "property", "value".
+std::string overlayJson(const std::vector<OverlayRow>& rows);
+
+/// "objects", each with "path" and, where it cannot be fetched, "problem"; "associations" with their class and the
+/// places of their ends in the list of objects.
+std::string graphJson(const Graph& graph);
+
+/// The rows of `classes`.
+std::string classRowsJson(const std::vector<ClassRow>& rows);
+
+}  // namespace zorva::cli

@@ -1,0 +1,38 @@
+#include "cli/output/Console.h"
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <string>
+
+#include "cli/output/Failure.h"
+#include "cli/output/Progress.h"
+
+namespace zorva::cli {
+
+void tell(const char* kind, std::string_view what) {
+  std::fflush(stdout);
+  Progress::makeRoom();
+  const std::string line = std::string("zorvactl: ") + kind + std::string(what) + "\n";
+  std::fwrite(line.data(), 1, line.size(), stderr);
+}
+
+void tellError(std::string_view what, std::string_view hint) {
+  tell("", what);
+  if (!hint.empty()) tell("", hint);
+}
+
+void tellWarning(std::string_view what) { tell("warning: ", what); }
+
+void tellNote(std::string_view what) { tell("note: ", what); }
+
+void write(std::string_view text) {
+  if (std::fwrite(text.data(), 1, text.size(), stdout) != text.size()) flushOutput();
+}
+
+void flushOutput() {
+  if (std::fflush(stdout) == 0 && std::ferror(stdout) == 0) return;
+  throw Failure(ExitCode::Failed, std::string("cannot write to standard output: ") + std::strerror(errno));
+}
+
+}  // namespace zorva::cli
