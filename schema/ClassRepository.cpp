@@ -360,11 +360,6 @@ const ClassMethod* Class::findMethod(std::string_view name) const noexcept {
   return at < methods_.size() ? methods_[at] : nullptr;
 }
 
-const ClassProperty* Class::findReference(std::string_view name) const noexcept {
-  const std::size_t at = indexOf(references_, name);
-  return at < references_.size() ? references_[at] : nullptr;
-}
-
 bool Class::isA(const Class& ancestor) const noexcept {
   for (const Class* at = this; at != nullptr; at = at->superclass_) {
     if (at == &ancestor) return true;

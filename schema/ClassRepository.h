@@ -63,10 +63,9 @@ class Class {
   /// The reference properties, in the order of properties(). Empty for what is no association.
   const std::vector<const ClassProperty*>& references() const noexcept { return references_; }
 
-  /// Null where the class has no such property, method or reference.
+  /// Null where the class has no such property or method.
   const ClassProperty* findProperty(std::string_view name) const noexcept;
   const ClassMethod* findMethod(std::string_view name) const noexcept;
-  const ClassProperty* findReference(std::string_view name) const noexcept;
 
   bool isAssociation() const noexcept { return isAssociation_; }
   bool isAbstract() const noexcept { return isAbstract_; }

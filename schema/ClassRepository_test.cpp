@@ -151,9 +151,8 @@ TEST_F(ClassRepositoryTest, KnowsAssociationsAndTheirEnds) {
   EXPECT_FALSE(get("Host").isAssociation());
   EXPECT_THAT(names(hostPort.references()), ElementsAre("Left", "Right"));
   EXPECT_THAT(names(hostPort.keys()), ElementsAre("Left", "Right"));
-  EXPECT_EQ(hostPort.findReference("LEFT")->reference, &get("Host"));
-  EXPECT_EQ(hostPort.findReference("LEFT")->referenceClass, "Host");
-  EXPECT_EQ(hostPort.findReference("Why"), nullptr);
+  EXPECT_EQ(hostPort.findProperty("LEFT")->reference, &get("Host"));
+  EXPECT_EQ(hostPort.findProperty("LEFT")->referenceClass, "Host");
   EXPECT_TRUE(get("Link").isAbstract());
   EXPECT_FALSE(hostPort.isAbstract());
 }
@@ -184,7 +183,7 @@ TEST_F(ClassRepositoryTest, FindsTheConcreteAssociationsOfAClass) {
 
 TEST_F(ClassRepositoryTest, AReferenceMayNameItsOwnClass) {
   load("[Association] class Chain { [Key] Chain REF Up; [Key] Chain REF Down; };");
-  EXPECT_EQ(get("Chain").findReference("Up")->reference, &get("Chain"));
+  EXPECT_EQ(get("Chain").findProperty("Up")->reference, &get("Chain"));
 }
 
 TEST_F(ClassRepositoryTest, DeclarationGivesBackWhatTheClassItselfSays) {

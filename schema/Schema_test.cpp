@@ -145,8 +145,8 @@ TEST_F(ZorvaClasses, AssociationsHaveTheirTwoEnds) {
     EXPECT_TRUE(association.isAssociation()) << row.name;
     EXPECT_THAT(names(association.references()), ElementsAre(row.left, row.right));
     EXPECT_THAT(names(association.keys()), ElementsAre(row.left, row.right));
-    EXPECT_EQ(association.findReference(row.left)->reference, &get(row.leftClass)) << row.name;
-    EXPECT_EQ(association.findReference(row.right)->reference, &get(row.rightClass)) << row.name;
+    EXPECT_EQ(association.findProperty(row.left)->reference, &get(row.leftClass)) << row.name;
+    EXPECT_EQ(association.findProperty(row.right)->reference, &get(row.rightClass)) << row.name;
   }
 }
 

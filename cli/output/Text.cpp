@@ -117,13 +117,6 @@ std::vector<std::string> wrapped(std::string_view text, std::size_t width) {
   return lines;
 }
 
-std::string padded(std::string_view text, std::size_t width) {
-  const std::size_t columns = displayWidth(text);
-  std::string out(text);
-  if (columns < width) out.append(width - columns, ' ');
-  return out;
-}
-
 std::string asUtf8(std::string_view text) {
   std::string out;
   out.reserve(text.size());

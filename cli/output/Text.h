@@ -22,9 +22,6 @@ std::size_t displayWidth(std::string_view text);
 /// character wider than `width` has a line of its own. `width` 0 means no limit.
 std::vector<std::string> wrapped(std::string_view text, std::size_t width);
 
-/// `text` with blanks behind it up to `width` columns.
-std::string padded(std::string_view text, std::size_t width);
-
 /// `text` for a document that must be UTF-8: a byte that is none stands as the character U+10EE00 plus the byte, as in
 /// the agent's own documents.
 std::string asUtf8(std::string_view text);

@@ -61,11 +61,6 @@ TEST(Wrapped, TakesAMegabyteInItsStride) {
   EXPECT_EQ(lines.size(), (1U << 20U) / 8);
 }
 
-TEST(Padded, FillsUpToTheColumn) {
-  EXPECT_EQ(padded("\xC3\xA9", 3), "\xC3\xA9  ");
-  EXPECT_EQ(padded("abc", 2), "abc");
-}
-
 TEST(AsUtf8, MarksBytesThatAreNoUtf8AsTheAgentDoes) {
   EXPECT_EQ(asUtf8("a\xFF"), "a\xF4\x8E\xBB\xBF");  // U+10EE00 + 0xFF = U+10EEFF
   EXPECT_EQ(asUtf8("\xC3\xA9"), "\xC3\xA9");
