@@ -141,9 +141,11 @@ void addCompletionCommands(CommandLine& line) {
 
   // For that script alone.
   const auto words = std::make_shared<std::vector<std::string>>();
-  line.add("complete", "").hidden().words("WORD", "", Many::Any, *words).runs([&line, words](const Globals& globals) {
-    completeWords(line, globals, *words);
-  });
+  line.add("complete", "")
+      .hidden()
+      .writes({OutputFormat::Table, OutputFormat::Json})
+      .words("WORD", "", Many::Any, *words)
+      .runs([&line, words](const Globals& globals) { completeWords(line, globals, *words); });
 }
 
 }  // namespace zorva::cli
