@@ -1,0 +1,52 @@
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "cli/testing/Running.h"
+
+namespace zorva::cli {
+namespace {
+
+TEST_F(Changing, DomainSetsTheDomain) {
+  done(host_, {"domain", "eth0", "lab.example.org"});
+  EXPECT_EQ(file(), wholeFileWith("DOMAINNAME=example.org", "DOMAINNAME=lab.example.org"));
+  done(host_, {"domain", "eth0", ""});
+  EXPECT_EQ(file(), wholeFileWith("DOMAINNAME=example.org", "DOMAINNAME="));
+}
+
+TEST_F(Changing, DomainSaysInOneSentenceWhatIsNoName) {
+  const Outcome outcome = host_.run({"domain", "eth0", "bad..name"});
+  EXPECT_EQ(outcome.exitCode, 2);
+  EXPECT_EQ(
+      outcome.err,
+      "zorvactl: 'bad..name' is no domain name: it has letters, digits, '-' and '_' between single dots, at most 63 "
+      "in each part and 253 in all\n");
+  EXPECT_EQ(file(), kWholeFile);
+}
+
+TEST_F(Changing, SuffixCommandsRefuseWhatIsNoName) {
+  for (const char* command : {"set", "add"}) {
+    for (const char* suffix : {"a b", "", "a..b", "under/score", "192.0.2.1%", "m\xC3\xBCller.example"}) {
+      expectFailed(host_, {"suffixes", command, "good.example", suffix}, 2,
+                   std::string("'") + suffix + "' is no suffix");
+    }
+    expectFailed(host_, {"suffixes", command, "a.example", "A.Example."}, 2, "'A.Example.' is given twice");
+  }
+  EXPECT_EQ(file(), kWholeFile);
+}
+
+TEST_F(Changing, SuffixCommandsChangeTheSuffixesOfTheHost) {
+  done(host_, {"suffixes", "set", "a.example", "b.example"});
+  EXPECT_EQ(file(), wholeFileWith("DNSSUFFIXES=example.org example.net ", "DNSSUFFIXES=a.example b.example "));
+  done(host_, {"suffixes", "add", "c.example"});
+  done(host_, {"suffixes", "remove", "a.example"});
+  EXPECT_EQ(done(host_, {"suffixes", "show"}), "b.example\nc.example\n");
+  EXPECT_EQ(done(host_, {"suffixes", "set"}),
+            "ZORVA_DNSGeneralSettingData.InstanceID=\"dnsgen1:host1\"\n  DNSSuffixesToAppend\n");
+}
+
+TEST(Suffixes, SayThatAHostWithoutInterfacesHasNone) {
+  expectFailed(TestHost(Words{}), {"suffixes", "show"}, 1, "no general DNS settings");
+}
+
+}  // namespace
+}  // namespace zorva::cli

@@ -1,0 +1,74 @@
+#pragma once
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <nlohmann/json.hpp>
+#include <string>
+#include <vector>
+
+#include "cli/testing/TestHost.h"
+
+// For tests of commands: zorvactl run as a process on hosts that are tree files, and what such a run must come to.
+
+namespace zorva::cli {
+
+using Words = std::vector<std::string>;
+
+/// The file of settings of eth0.
+inline constexpr const char* kWholeFile =
+    "BOOTPROTO=none\nHOSTNAME=host1\nDOMAINNAME=example.org\nCONFIG_NAME=\nDNSSERVERS=192.0.2.53 2001:db8::53 \n"
+    "DNSSUFFIXES=example.org example.net \n";
+
+/// Standard output of a run that is expected to go well.
+inline std::string shown(const TestHost& host, const Words& words) {
+  const Outcome outcome = host.run(words);
+  EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
+  return outcome.out;
+}
+
+inline nlohmann::json jsonShown(const TestHost& host, Words words) {
+  words.insert(words.end(), {"--output", "json"});
+  return nlohmann::json::parse(shown(host, words));
+}
+
+/// Checks that a run ends with this exit code and tells this, without a word on standard output.
+inline void expectRefused(const TestHost& host, const Words& words, int exitCode, const std::string& told) {
+  const Outcome outcome = host.run(words);
+  EXPECT_EQ(outcome.exitCode, exitCode);
+  EXPECT_EQ(outcome.out, "");
+  EXPECT_THAT(outcome.err, testing::HasSubstr(told));
+}
+
+/// Does it without a warning.
+inline std::string done(const TestHost& host, const Words& words) {
+  const Outcome outcome = host.run(words);
+  EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
+  EXPECT_EQ(outcome.err, "");
+  return outcome.out;
+}
+
+/// Checks that a run ends with this exit code and tells this.
+inline void expectFailed(const TestHost& host, const Words& words, int exitCode, const std::string& told) {
+  const Outcome outcome = host.run(words);
+  EXPECT_EQ(outcome.exitCode, exitCode) << outcome.out;
+  EXPECT_THAT(outcome.err, testing::HasSubstr(told));
+}
+
+/// A host on which both interfaces have their files.
+class Changing : public testing::Test {
+ protected:
+  Changing() { host_.directory().write("data/ifcfg-eth0", kWholeFile); }
+
+  std::string file() const { return zorva::agent::testing::contentsOf(host_.dataFile("ifcfg-eth0")); }
+
+  /// The file with one line changed.
+  static std::string wholeFileWith(const std::string& from, const std::string& to) {
+    std::string text = kWholeFile;
+    return text.replace(text.find(from), from.size(), to);
+  }
+
+  TestHost host_;
+};
+
+}  // namespace zorva::cli
