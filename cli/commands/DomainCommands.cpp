@@ -5,7 +5,7 @@
 #include "cli/commands/SettingList.h"
 #include "cli/output/ResultWriter.h"
 #include "cli/session/Assignments.h"
-#include "schema/Names.h"
+#include "util/Names.h"
 
 namespace zorva::cli {
 
@@ -24,7 +24,7 @@ void requireSuffix(const std::string& text) {
 
 bool sameSuffix(const std::string& a, const std::string& b) {
   const auto plain = [](std::string_view text) { return text.substr(0, text.size() - (text.ends_with('.') ? 1 : 0)); };
-  return schema::sameName(plain(a), plain(b));
+  return util::sameName(plain(a), plain(b));
 }
 
 constexpr ListSetting kSuffixes{"suffixes", "DNSSuffixesToAppend", "suffix",  "SUFFIX", "A domain's name",

@@ -7,6 +7,7 @@
 #include <string_view>
 
 #include "http/Listener.h"
+#include "util/FileDescriptor.h"
 
 // For tests: a client that sends any bytes, valid HTTP or not.
 
@@ -45,7 +46,7 @@ class Wire {
   bool chunks(WireResponse& response, std::chrono::steady_clock::time_point deadline);
   bool fields(std::map<std::string, std::string>& out, std::chrono::steady_clock::time_point deadline);
 
-  Descriptor socket_;
+  util::FileDescriptor socket_;
   std::string unread_;
 };
 

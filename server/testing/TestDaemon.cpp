@@ -67,15 +67,16 @@ TestDaemon::TestDaemon(const std::string& config, std::vector<std::string> argum
 
   int ends[2];
   if (::pipe2(ends, O_CLOEXEC) != 0) throw std::runtime_error("no pipe");
-  out_ = http::Descriptor(ends[0]);
-  http::Descriptor out(ends[1]);
-  const http::Descriptor err(::open((directory_ / "stderr").c_str(), O_WRONLY | O_CREAT | O_APPEND | O_CLOEXEC, 0600));
+  out_ = util::FileDescriptor(ends[0]);
+  util::FileDescriptor out(ends[1]);
+  const util::FileDescriptor err(
+      ::open((directory_ / "stderr").c_str(), O_WRONLY | O_CREAT | O_APPEND | O_CLOEXEC, 0600));
   process_ = ::fork();
   if (process_ == 0) {
     if (prepare) prepare();
     become(arguments, out.get(), err.get());
   }
-  out = http::Descriptor();
+  out = util::FileDescriptor();
 
   const std::string line = firstLine(out_.get(), std::chrono::seconds(60));
   const std::size_t end = line.find_first_of(" \n", line.find("http://"));
@@ -127,8 +128,8 @@ void TestDaemon::writeConfig(const std::string& config) const {
 
 DaemonOutcome TestDaemon::run(const std::vector<std::string>& arguments) {
   const zorva::agent::testing::TemporaryDirectory directory;
-  const http::Descriptor out(::open((directory / "out").c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600));
-  const http::Descriptor err(::open((directory / "err").c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600));
+  const util::FileDescriptor out(::open((directory / "out").c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600));
+  const util::FileDescriptor err(::open((directory / "err").c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600));
   const pid_t process = ::fork();
   if (process == 0) become(arguments, out.get(), err.get());
   int status = 0;

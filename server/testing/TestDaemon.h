@@ -10,6 +10,7 @@
 
 #include "agent/testing/TemporaryDirectory.h"
 #include "http/Listener.h"
+#include "util/FileDescriptor.h"
 
 // For tests: zorvacimd itself, on a host that is a tree in a file.
 
@@ -53,7 +54,7 @@ class TestDaemon {
  private:
   zorva::agent::testing::TemporaryDirectory directory_;
   pid_t process_ = -1;
-  http::Descriptor out_;
+  util::FileDescriptor out_;
   int port_ = 0;
 };
 
