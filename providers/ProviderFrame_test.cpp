@@ -1,36 +1,9 @@
-// Common to all twelve providers: create functions, function tables, and the operations that do no work.
-#include <ProviderCall.h>
+// What all twelve providers have alike: create functions, function tables, and the operations that do no work.
+#include <Providers.h>
 #include <World.h>
 #include <gmock/gmock.h>
 
 #include <set>
-
-#define INSTANCE_MI(prefix) \
-  extern "C" CMPIInstanceMI* prefix##_Create_InstanceMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
-#define ASSOCIATION_MI(prefix) \
-  extern "C" CMPIAssociationMI* prefix##_Create_AssociationMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
-
-INSTANCE_MI(DNSClientProvider)
-extern "C" CMPIMethodMI* DNSClientProvider_Create_MethodMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
-INSTANCE_MI(DNSRemoteServiceAccessPointProvider)
-INSTANCE_MI(DNSSettingDataProvider)
-INSTANCE_MI(DNSGeneralSettingDataProvider)
-INSTANCE_MI(DNSRemoteAccessAvailableToElementProvider)
-ASSOCIATION_MI(DNSRemoteAccessAvailableToElementProvider)
-INSTANCE_MI(DNSSAPSAPDependencyProvider)
-ASSOCIATION_MI(DNSSAPSAPDependencyProvider)
-INSTANCE_MI(DNSHostedAccessPointProvider)
-ASSOCIATION_MI(DNSHostedAccessPointProvider)
-INSTANCE_MI(DNSGeneralElementSettingDataProvider)
-ASSOCIATION_MI(DNSGeneralElementSettingDataProvider)
-INSTANCE_MI(DNSGenEndPointElementSettingDataProvider)
-ASSOCIATION_MI(DNSGenEndPointElementSettingDataProvider)
-INSTANCE_MI(DNSEndPointElementSettingDataProvider)
-ASSOCIATION_MI(DNSEndPointElementSettingDataProvider)
-INSTANCE_MI(DNSGeneralOrderedComponentProvider)
-ASSOCIATION_MI(DNSGeneralOrderedComponentProvider)
-INSTANCE_MI(DNSOrderedComponentProvider)
-ASSOCIATION_MI(DNSOrderedComponentProvider)
 
 namespace ZV::Test {
 namespace {
@@ -38,57 +11,11 @@ namespace {
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
-// The names of a provider: for CIM servers and in the log. They differ in places, and must not be changed.
-struct Provider {
-  InstanceProvider::Create create;
-  AssociationProvider::Create createAssociation;  // null: it has none
-  const char* prefix;
-  const char* stem;
-  const char* source;
-  const char* className;
-};
-
-void PrintTo(const Provider& provider, std::ostream* out) { *out << provider.prefix; }
-
-#define PLAIN(prefix) prefix##_Create_InstanceMI, nullptr, #prefix
-#define BOTH(prefix) prefix##_Create_InstanceMI, prefix##_Create_AssociationMI, #prefix
-
-const Provider kProviders[] = {
-    {PLAIN(DNSClientProvider), "DNSClient", "DNSClientProvider", "ZORVA_DNSProtocolEndPoint"},
-    {PLAIN(DNSRemoteServiceAccessPointProvider), "DNSRemoteServiceAccessPoint", "DNSRemoteServiceAccessPointProvider",
-     "ZORVA_RemoteServiceAccessPoint"},
-    {PLAIN(DNSSettingDataProvider), "DNSSettingData", "DNSSettingDataProvider", "ZORVA_DNSSettingData"},
-    {PLAIN(DNSGeneralSettingDataProvider), "DNSGeneralSettingData", "DNSGeneralSettingDataProvider",
-     "ZORVA_DNSGeneralSettingData"},
-    {BOTH(DNSRemoteAccessAvailableToElementProvider), "DNSRemoteAccessAvailableToElement",
-     "DNSRemoteAccessAvailableToElementProvider", "ZORVA_RemoteAccessAvailableToElement"},
-    {BOTH(DNSSAPSAPDependencyProvider), "DNSSAPSAPDependency", "DNSSAPSAPDependencyProvider",
-     "ZORVA_DNSSAPSAPDependency"},
-    {BOTH(DNSHostedAccessPointProvider), "DNSHostedAccessPoint", "DNSHostedAccessPointProvider",
-     "ZORVA_DNSHostedAccessPoint"},
-    {BOTH(DNSGeneralElementSettingDataProvider), "DNSGeneralElementSettingData", "DNSGeneralElementSettingDataProvider",
-     "ZORVA_DNSGeneralElementSettingData"},
-    {BOTH(DNSGenEndPointElementSettingDataProvider), "DNSGenEndpointElementSettingData",
-     "DNSGenEndpointElementSettingDataProvider", "ZORVA_DNSGenEndPointElementSettingData"},
-    {BOTH(DNSEndPointElementSettingDataProvider), "DNSEndpointElementSettingData",
-     "DNSEndpointElementSettingDataProvider", "ZORVA_DNSEndPointElementSettingData"},
-    {BOTH(DNSGeneralOrderedComponentProvider), "DNSGeneralOrderedComponent", "DNSGenOrderedComponentProvider",
-     "ZORVA_DNSGenOrderedComponent"},
-    {BOTH(DNSOrderedComponentProvider), "DNSOrderedComponent", "DNSOrderedComponentProvider",
-     "ZORVA_DNSOrderedComponent"},
-};
-
 bool isModifiable(const Provider& provider) {
   return std::set<std::string>{"DNSClient", "DNSSettingData", "DNSGeneralSettingData"}.contains(provider.stem);
 }
 
-// The source's name, except for the provider whose category keeps the long word.
-std::string categoryOf(const Provider& provider) {
-  const std::string source = provider.source;
-  return "Zorvagent." + (source == "DNSGenOrderedComponentProvider" ? "DNSGeneralOrderedComponentProvider" : source);
-}
-
-// The call did nothing and logged nothing.
+// Did nothing, and said nothing.
 void expectNoWork(const Outcome& outcome, CMPIrc rc) {
   EXPECT_EQ(rc, outcome.rc);
   EXPECT_EQ(std::nullopt, outcome.message);
@@ -107,7 +34,7 @@ class EveryProvider : public ::testing::TestWithParam<Provider> {
 class EveryAssociationProvider : public EveryProvider {};
 
 TEST_P(EveryProvider, IsMadeWithoutAStatusOrAContext) {
-  ASSERT_NE(nullptr, GetParam().create(broker.cmpi(), nullptr, nullptr));
+  ASSERT_NE(nullptr, GetParam().createInstanceMI(broker.cmpi(), nullptr, nullptr));
   EXPECT_EQ(0U, broker.callCount());
   EXPECT_EQ(0U, logger.size());
 }
@@ -115,28 +42,28 @@ TEST_P(EveryProvider, IsMadeWithoutAStatusOrAContext) {
 TEST_P(EveryProvider, LeavesTheStatusOfItsCreationUntouched) {
   CMPIStatus status{CMPI_RC_ERR_FAILED, broker.makeString("before")};
   const CMPIString* const before = status.msg;
-  GetParam().create(broker.cmpi(), broker.makeContext(), &status);
+  GetParam().createInstanceMI(broker.cmpi(), broker.makeContext(), &status);
   EXPECT_EQ(CMPI_RC_ERR_FAILED, status.rc);
   EXPECT_EQ(before, status.msg);
 }
 
-TEST_P(EveryProvider, AlwaysReturnsTheSameTable) {
-  CMPIInstanceMI* const mi = GetParam().create(broker.cmpi(), nullptr, nullptr);
+TEST_P(EveryProvider, HandsOutOneTableForEver) {
+  CMPIInstanceMI* const mi = GetParam().createInstanceMI(broker.cmpi(), nullptr, nullptr);
   EXPECT_EQ(nullptr, mi->hdl);
   EXPECT_EQ(200, mi->ft->ftVersion);
   EXPECT_EQ(200, mi->ft->miVersion);
   EXPECT_EQ("instance" + std::string(GetParam().prefix), mi->ft->miName);
-  EXPECT_EQ(mi, GetParam().create(broker.cmpi(), nullptr, nullptr));
+  EXPECT_EQ(mi, GetParam().createInstanceMI(broker.cmpi(), nullptr, nullptr));
 }
 
 TEST_P(EveryProvider, HasNothingToCleanUp) {
-  InstanceProvider provider(GetParam().create, broker);
+  InstanceProvider provider(GetParam().createInstanceMI, broker);
   expectNoWork(provider.cleanup(true), CMPI_RC_OK);
   expectNoWork(provider.cleanup(false), CMPI_RC_OK);
 }
 
 TEST_P(EveryProvider, RefusesToMakeDeleteOrQuery) {
-  InstanceProvider provider(GetParam().create, broker);
+  InstanceProvider provider(GetParam().createInstanceMI, broker);
   expectNoWork(provider.createInstance(path(), Instance(GetParam().className)), CMPI_RC_ERR_NOT_SUPPORTED);
   expectNoWork(provider.deleteInstance(path()), CMPI_RC_ERR_NOT_SUPPORTED);
   expectNoWork(provider.execQuery(path(), "SELECT * FROM X", "CIM:CQL"), CMPI_RC_ERR_NOT_SUPPORTED);
@@ -145,7 +72,7 @@ TEST_P(EveryProvider, RefusesToMakeDeleteOrQuery) {
 TEST_P(EveryProvider, RefusesModificationUnlessItIsOneOfThree) {
   World world;
   world.host().install();
-  InstanceProvider provider(GetParam().create, broker);
+  InstanceProvider provider(GetParam().createInstanceMI, broker);
   const Outcome outcome = provider.modifyInstance(path(), Instance(GetParam().className));
   if (isModifiable(GetParam())) {
     EXPECT_TRUE(outcome.markedEntry());
@@ -155,7 +82,7 @@ TEST_P(EveryProvider, RefusesModificationUnlessItIsOneOfThree) {
 }
 
 TEST_P(EveryProvider, RefusedOperationsUseNoneOfTheirArguments) {
-  CMPIInstanceMI* const mi = GetParam().create(nullptr, nullptr, nullptr);
+  CMPIInstanceMI* const mi = GetParam().createInstanceMI(nullptr, nullptr, nullptr);
   EXPECT_EQ(CMPI_RC_OK, mi->ft->cleanup(nullptr, nullptr, 0).rc);
   EXPECT_EQ(CMPI_RC_ERR_NOT_SUPPORTED, mi->ft->createInstance(nullptr, nullptr, nullptr, nullptr, nullptr).rc);
   EXPECT_EQ(CMPI_RC_ERR_NOT_SUPPORTED, mi->ft->deleteInstance(nullptr, nullptr, nullptr, nullptr).rc);
@@ -165,9 +92,9 @@ TEST_P(EveryProvider, RefusedOperationsUseNoneOfTheirArguments) {
 TEST_P(EveryProvider, OpensItsOperationsUnderItsOwnNameAndCategory) {
   World world;
   world.host().install();
-  InstanceProvider provider(GetParam().create, broker);
+  InstanceProvider provider(GetParam().createInstanceMI, broker);
   const std::string stem = GetParam().stem;
-  const std::string file = "providers/" + std::string(GetParam().source) + ".cpp";
+  const std::string file = GetParam().file();
   const std::pair<std::string, Outcome> operations[] = {
       {"_EnumInstanceNames", provider.enumerateInstanceNames(path())},
       {"_EnumInstances", provider.enumerateInstances(path())},
@@ -175,19 +102,19 @@ TEST_P(EveryProvider, OpensItsOperationsUnderItsOwnNameAndCategory) {
   for (const auto& [operation, outcome] : operations) {
     EXPECT_TRUE(outcome.markedEntry()) << operation;
     EXPECT_TRUE(outcome.lines.entered(stem + operation, file)) << outcome;
-    EXPECT_EQ(categoryOf(GetParam()), outcome.lines.at(1).category);
+    EXPECT_EQ(GetParam().category(), outcome.lines.at(1).category);
   }
 }
 
 TEST_P(EveryProvider, LatestCreationsBrokerServesAllItsTables) {
   World world;
   world.nic("eth0", usualNic()).install();
-  InstanceProvider provider(GetParam().create, broker);
+  InstanceProvider provider(GetParam().createInstanceMI, broker);
   RecordingBroker later;
-  if (GetParam().createAssociation != nullptr) {
-    const AssociationProvider other(GetParam().createAssociation, later);
+  if (GetParam().createAssociationMI != nullptr) {
+    const AssociationProvider other(GetParam().createAssociationMI, later);
   } else {
-    const InstanceProvider other(GetParam().create, later);
+    const InstanceProvider other(GetParam().createInstanceMI, later);
   }
   provider.enumerateInstances(path());
   EXPECT_EQ(0U, broker.callsOf("newObjectPath"));
@@ -196,17 +123,17 @@ TEST_P(EveryProvider, LatestCreationsBrokerServesAllItsTables) {
 
 TEST_P(EveryAssociationProvider, ReturnsItsTable) {
   CMPIStatus status{CMPI_RC_ERR_FAILED, nullptr};
-  CMPIAssociationMI* const mi = GetParam().createAssociation(broker.cmpi(), nullptr, &status);
+  CMPIAssociationMI* const mi = GetParam().createAssociationMI(broker.cmpi(), nullptr, &status);
   EXPECT_EQ(CMPI_RC_ERR_FAILED, status.rc);
   EXPECT_EQ(nullptr, mi->hdl);
   EXPECT_EQ(200, mi->ft->ftVersion);
   EXPECT_EQ(200, mi->ft->miVersion);
   EXPECT_EQ("association" + std::string(GetParam().prefix), mi->ft->miName);
-  EXPECT_EQ(mi, GetParam().createAssociation(broker.cmpi(), nullptr, nullptr));
+  EXPECT_EQ(mi, GetParam().createAssociationMI(broker.cmpi(), nullptr, nullptr));
 }
 
 TEST_P(EveryAssociationProvider, HasNothingToCleanUpEither) {
-  AssociationProvider provider(GetParam().createAssociation, broker);
+  AssociationProvider provider(GetParam().createAssociationMI, broker);
   expectNoWork(provider.cleanup(true), CMPI_RC_OK);
   expectNoWork(provider.cleanup(false), CMPI_RC_OK);
 }
@@ -214,9 +141,9 @@ TEST_P(EveryAssociationProvider, HasNothingToCleanUpEither) {
 TEST_P(EveryAssociationProvider, OpensItsOperationsUnderItsOwnNameAndCategory) {
   World world;
   world.host().install();
-  AssociationProvider provider(GetParam().createAssociation, broker);
+  AssociationProvider provider(GetParam().createAssociationMI, broker);
   const std::string stem = GetParam().stem;
-  const std::string file = "providers/" + std::string(GetParam().source) + ".cpp";
+  const std::string file = GetParam().file();
   const Path unknown = Path("ZORVA_Unknown");
   const std::pair<std::string, Outcome> operations[] = {{"_Associators", provider.associators(unknown, {})},
                                                         {"_AssociatorNames", provider.associatorNames(unknown, {})},
@@ -225,36 +152,26 @@ TEST_P(EveryAssociationProvider, OpensItsOperationsUnderItsOwnNameAndCategory) {
   for (const auto& [operation, outcome] : operations) {
     EXPECT_TRUE(outcome.markedEntry()) << operation;
     EXPECT_TRUE(outcome.lines.entered(stem + operation, file)) << outcome;
-    EXPECT_EQ(categoryOf(GetParam()), outcome.lines.at(1).category);
+    EXPECT_EQ(GetParam().category(), outcome.lines.at(1).category);
   }
 }
 
 TEST_P(EveryAssociationProvider, LatestCreationsBrokerServesBothTables) {
   World world;
   world.nic("eth0", usualNic()).install();
-  AssociationProvider provider(GetParam().createAssociation, broker);
+  AssociationProvider provider(GetParam().createAssociationMI, broker);
   RecordingBroker later;
-  InstanceProvider other(GetParam().create, later);
+  InstanceProvider other(GetParam().createInstanceMI, later);
   other.enumerateInstances(path());
   EXPECT_LT(0U, later.callCount());
   EXPECT_EQ(0U, broker.callCount());
 }
 
-std::string nameOfProvider(const ::testing::TestParamInfo<Provider>& row) { return row.param.stem; }
-
-std::vector<Provider> associationProviders() {
-  std::vector<Provider> some;
-  for (const Provider& provider : kProviders) {
-    if (provider.createAssociation != nullptr) some.push_back(provider);
-  }
-  return some;
-}
-
-INSTANTIATE_TEST_SUITE_P(Of, EveryProvider, ::testing::ValuesIn(kProviders), nameOfProvider);
-INSTANTIATE_TEST_SUITE_P(Of, EveryAssociationProvider, ::testing::ValuesIn(associationProviders()), nameOfProvider);
+INSTANTIATE_TEST_SUITE_P(Of, EveryProvider, ::testing::ValuesIn(allProviders()), stemOf);
+INSTANTIATE_TEST_SUITE_P(Of, EveryAssociationProvider, ::testing::ValuesIn(associationProviders()), stemOf);
 
 TEST(ProviderFrame, TwelveProvidersHaveEightAssociations) {
-  EXPECT_EQ(12U, std::size(kProviders));
+  EXPECT_EQ(12U, allProviders().size());
   EXPECT_EQ(8U, associationProviders().size());
 }
 

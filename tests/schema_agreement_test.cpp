@@ -1,6 +1,6 @@
-// Compares what the providers set with the classes that they publish. A property that a class lacks, or has with
-// another type, would be refused by the broker and never reach the client.
-#include <ProviderCall.h>
+// What the providers really set, held against the classes that they publish: a property that a class lacks, or has with
+// another type, would be refused by the broker and lost on its way to the client.
+#include <Providers.h>
 #include <RecordingBroker.h>
 #include <World.h>
 #include <gtest/gtest.h>
@@ -12,48 +12,33 @@
 #include "schema/ClassRepository.h"
 #include "schema/Schema.h"
 
-#define ZV_CREATE(prefix) \
-  extern "C" CMPIInstanceMI* prefix##_Create_InstanceMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*)
-ZV_CREATE(DNSClientProvider);
-ZV_CREATE(DNSRemoteServiceAccessPointProvider);
-ZV_CREATE(DNSSettingDataProvider);
-ZV_CREATE(DNSGeneralSettingDataProvider);
-ZV_CREATE(DNSRemoteAccessAvailableToElementProvider);
-ZV_CREATE(DNSSAPSAPDependencyProvider);
-ZV_CREATE(DNSHostedAccessPointProvider);
-ZV_CREATE(DNSGeneralElementSettingDataProvider);
-ZV_CREATE(DNSGenEndPointElementSettingDataProvider);
-ZV_CREATE(DNSEndPointElementSettingDataProvider);
-ZV_CREATE(DNSGeneralOrderedComponentProvider);
-ZV_CREATE(DNSOrderedComponentProvider);
-#undef ZV_CREATE
-
 namespace ZV::Test {
 namespace {
 
 struct Published {
-  const char* className;
-  InstanceProvider::Create create;
+  const char* prefix;      // of its provider
   std::size_t instances;   // on the host below
   std::size_t properties;  // that the provider sets, keys included
+
+  const Provider& provider() const { return *findProvider(prefix); }
 };
 
 const Published kPublished[] = {
-    {"ZORVA_DNSProtocolEndPoint", DNSClientProvider_Create_InstanceMI, 3, 15},
-    {"ZORVA_RemoteServiceAccessPoint", DNSRemoteServiceAccessPointProvider_Create_InstanceMI, 3, 12},
-    {"ZORVA_DNSSettingData", DNSSettingDataProvider_Create_InstanceMI, 3, 11},
-    {"ZORVA_DNSGeneralSettingData", DNSGeneralSettingDataProvider_Create_InstanceMI, 1, 7},
-    {"ZORVA_RemoteAccessAvailableToElement", DNSRemoteAccessAvailableToElementProvider_Create_InstanceMI, 9, 3},
-    {"ZORVA_DNSSAPSAPDependency", DNSSAPSAPDependencyProvider_Create_InstanceMI, 2, 2},
-    {"ZORVA_DNSHostedAccessPoint", DNSHostedAccessPointProvider_Create_InstanceMI, 3, 2},
-    {"ZORVA_DNSGeneralElementSettingData", DNSGeneralElementSettingDataProvider_Create_InstanceMI, 1, 4},
-    {"ZORVA_DNSGenEndPointElementSettingData", DNSGenEndPointElementSettingDataProvider_Create_InstanceMI, 3, 4},
-    {"ZORVA_DNSEndPointElementSettingData", DNSEndPointElementSettingDataProvider_Create_InstanceMI, 3, 4},
-    {"ZORVA_DNSGenOrderedComponent", DNSGeneralOrderedComponentProvider_Create_InstanceMI, 1, 3},
-    {"ZORVA_DNSOrderedComponent", DNSOrderedComponentProvider_Create_InstanceMI, 1, 3},
+    {"DNSClientProvider", 3, 15},
+    {"DNSRemoteServiceAccessPointProvider", 3, 12},
+    {"DNSSettingDataProvider", 3, 11},
+    {"DNSGeneralSettingDataProvider", 1, 7},
+    {"DNSRemoteAccessAvailableToElementProvider", 9, 3},
+    {"DNSSAPSAPDependencyProvider", 2, 2},
+    {"DNSHostedAccessPointProvider", 3, 2},
+    {"DNSGeneralElementSettingDataProvider", 1, 4},
+    {"DNSGenEndPointElementSettingDataProvider", 3, 4},
+    {"DNSEndPointElementSettingDataProvider", 3, 4},
+    {"DNSGeneralOrderedComponentProvider", 1, 3},
+    {"DNSOrderedComponentProvider", 1, 3},
 };
 
-void PrintTo(const Published& published, std::ostream* out) { *out << published.className; }
+void PrintTo(const Published& published, std::ostream* out) { *out << published.prefix; }
 
 // CMPI's name of the type that a class declares, as describe() writes it. A text is set as chars, which the broker
 // converts to a string.
@@ -78,23 +63,15 @@ class Publishing : public ::testing::TestWithParam<Published> {
     world_.file("eth0",
                 "BOOTPROTO=static\nDOMAINNAME=example.org\nHOSTNAME=host1\nCONFIG_NAME=lab\n"
                 "DNSSERVERS=192.0.2.1,192.0.2.9\nDNSSUFFIXES=example.org,example.net\n");
-    broker_.serve("ZORVA_ComputerSystem",
-                  {object("ZORVA_ComputerSystem", "host1"), object("ZORVA_SPComputerSystem", "BMC:-1")});
-    broker_.serve("ZORVA_IPProtocolEndpoint", {onSystem("eth0"), onSystem("eth1")});
-    broker_.serve("ZORVA_IPAssignmentSettingData",
-                  {Instance("ZORVA_IPAssignmentSettingData").with("InstanceID", "Computer%eth0%ipv4")});
+    broker_.serve(kSystemClass, {objectOf(systemPath("host1")), Instance("ZORVA_SPComputerSystem")
+                                                                    .with("CreationClassName", "ZORVA_SPComputerSystem")
+                                                                    .with("Name", "BMC:-1")});
+    broker_.serve(kIpEndpointClass, objectsOf({ipEndpointPath("eth0"), ipEndpointPath("eth1")}));
+    broker_.serve(kIpAssignmentClass, objectsOf({ipAssignmentPath("Computer%eth0%ipv4")}));
   }
 
-  static Instance object(const char* className, const char* name) {
-    return Instance(className).with("CreationClassName", className).with("Name", name);
-  }
-  static Instance onSystem(const char* name) {
-    return object("ZORVA_IPProtocolEndpoint", name)
-        .with("SystemCreationClassName", "ZORVA_ComputerSystem")
-        .with("SystemName", "host1");
-  }
-
-  const zorva::schema::Class& publishedClass() const { return *classes_->find(GetParam().className); }
+  static std::string className() { return GetParam().provider().className; }
+  const zorva::schema::Class& publishedClass() const { return *classes_->find(className()); }
 
   World world_;
   RecordingBroker broker_;
@@ -103,15 +80,15 @@ class Publishing : public ::testing::TestWithParam<Published> {
 };
 
 INSTANTIATE_TEST_SUITE_P(Of, Publishing, ::testing::ValuesIn(kPublished),
-                         [](const auto& one) { return std::string(one.param.className).substr(6); });
+                         [](const auto& one) { return std::string(one.param.prefix); });
 
 TEST_P(Publishing, EveryPropertyThatIsSetIsDeclaredWithThatType) {
-  InstanceProvider provider(GetParam().create, broker_);
-  const Outcome outcome = provider.enumerateInstances(Path(GetParam().className));
+  InstanceProvider provider(GetParam().provider().createInstanceMI, broker_);
+  const Outcome outcome = provider.enumerateInstances(Path(className()));
   EXPECT_EQ(outcome.instances().size(), GetParam().instances);
   std::set<std::string> all;
   for (const Instance& instance : outcome.instances()) {
-    EXPECT_EQ(instance.path.className, GetParam().className);
+    EXPECT_EQ(instance.path.className, className());
     for (const auto& [name, value] : instance.properties) {
       const zorva::schema::ClassProperty* property = publishedClass().findProperty(name);
       ASSERT_NE(property, nullptr) << name;
@@ -124,8 +101,8 @@ TEST_P(Publishing, EveryPropertyThatIsSetIsDeclaredWithThatType) {
 }
 
 TEST_P(Publishing, EveryPathHasTheKeysOfItsClass) {
-  InstanceProvider provider(GetParam().create, broker_);
-  const Outcome outcome = provider.enumerateInstanceNames(Path(GetParam().className));
+  InstanceProvider provider(GetParam().provider().createInstanceMI, broker_);
+  const Outcome outcome = provider.enumerateInstanceNames(Path(className()));
   std::set<std::string> declared;
   for (const zorva::schema::ClassProperty* key : publishedClass().keys()) declared.insert(key->name);
   EXPECT_EQ(outcome.paths().size(), GetParam().instances);

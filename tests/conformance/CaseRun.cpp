@@ -189,7 +189,7 @@ struct Setting {
   std::vector<WrittenLine> broker;
   Request request;
   std::vector<std::string> shows;
-  const ProviderFunctions* provider = nullptr;
+  const Provider* provider = nullptr;
   CMPIValueState lie = CMPI_goodValue;
 };
 

@@ -125,22 +125,21 @@ RequestObjects::RequestObjects(RecordingBroker& broker, const Request& request)
   if (request.withoutHandle) instance->hdl = nullptr;
 }
 
-bool canAsk(const ProviderFunctions& provider, Operation operation) {
-  if (isAssociation(operation)) return provider.association != nullptr;
-  return !isMethod(operation) || provider.method != nullptr;
+bool canAsk(const Provider& provider, Operation operation) {
+  if (isAssociation(operation)) return provider.isAssociation();
+  return !isMethod(operation) || provider.createMethodMI != nullptr;
 }
 
-CMPIStatus ask(const ProviderFunctions& provider, RecordingBroker& broker, Request& request,
-               const RequestObjects& with) {
+CMPIStatus ask(const Provider& provider, RecordingBroker& broker, Request& request, const RequestObjects& with) {
   const Operation operation = request.operation;
   const char** properties = request.properties.cmpi();
   if (isMethod(operation)) {
-    CMPIMethodMI* mi = provider.method(broker.cmpi(), nullptr, nullptr);
+    CMPIMethodMI* mi = provider.createMethodMI(broker.cmpi(), nullptr, nullptr);
     if (operation == Operation::MethodCleanup) return mi->ft->cleanup(mi, with.context, 1);
     return mi->ft->invokeMethod(mi, with.context, with.result, with.ref, request.method.c_str(), with.in, with.out);
   }
   if (isAssociation(operation)) {
-    CMPIAssociationMI* mi = provider.association(broker.cmpi(), nullptr, nullptr);
+    CMPIAssociationMI* mi = provider.createAssociationMI(broker.cmpi(), nullptr, nullptr);
     const char* assocClass = textOrNull(request.assocClass);
     const char* resultClass = textOrNull(request.resultClass);
     const char* role = textOrNull(request.role);
@@ -160,7 +159,7 @@ CMPIStatus ask(const ProviderFunctions& provider, RecordingBroker& broker, Reque
         return mi->ft->cleanup(mi, with.context, 1);
     }
   }
-  CMPIInstanceMI* mi = provider.instance(broker.cmpi(), nullptr, nullptr);
+  CMPIInstanceMI* mi = provider.createInstanceMI(broker.cmpi(), nullptr, nullptr);
   switch (operation) {
     case Operation::EnumInstanceNames:
       return mi->ft->enumerateInstanceNames(mi, with.context, with.result, with.ref);

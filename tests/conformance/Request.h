@@ -62,10 +62,10 @@ struct RequestObjects {
   CMPIArgs* out;
 };
 
-// Makes the provider and calls it. Exceptions leave this function.
-CMPIStatus ask(const ProviderFunctions& provider, RecordingBroker& broker, Request& request,
+// Makes the provider and asks it. Exceptions pass.
+CMPIStatus ask(const Provider& provider, RecordingBroker& broker, Request& request,
                const RequestObjects& objects);
-// Whether the provider has the function table of the operation.
-bool canAsk(const ProviderFunctions& provider, Operation operation);
+// Whether the provider has the table that the operation stands in.
+bool canAsk(const Provider& provider, Operation operation);
 
 }  // namespace ZV::Test

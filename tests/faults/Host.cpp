@@ -7,9 +7,9 @@
 #include <fstream>
 #include <iterator>
 
+#include "ProfileObjects.h"
 #include "agent/Agent.h"
 #include "agent/files/FileWatch.h"
-#include "providers/testing/AssociationTestSupport.h"
 
 namespace ZV::Test {
 namespace {
@@ -68,11 +68,10 @@ Host::Host(Tree tree) {
 }
 
 void Host::serveOthers(RecordingBroker& broker) const {
-  broker.serve("ZORVA_ComputerSystem", {objectOf(systemPath("host1")), objectOf(systemPath("bmc"))});
-  broker.serve("ZORVA_IPProtocolEndpoint",
-               {objectOf(ipEndpointPath("eth0")), objectOf(ipEndpointPath("eth1")), objectOf(ipEndpointPath("wlan0"))});
-  broker.serve("ZORVA_IPAssignmentSettingData",
-               {objectOf(ipAssignmentPath("Computer%eth0%ipv4")), objectOf(ipAssignmentPath("Computer%eth1%ipv4"))});
+  broker.serve(kSystemClass, objectsOf({systemPath("host1"), systemPath("bmc")}));
+  broker.serve(kIpEndpointClass, objectsOf({ipEndpointPath("eth0"), ipEndpointPath("eth1"), ipEndpointPath("wlan0")}));
+  broker.serve(kIpAssignmentClass,
+               objectsOf({ipAssignmentPath("Computer%eth0%ipv4"), ipAssignmentPath("Computer%eth1%ipv4")}));
 }
 
 std::map<std::string, std::string> Host::files() const {

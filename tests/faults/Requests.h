@@ -5,31 +5,9 @@
 #include <string>
 #include <vector>
 
-#include "ProviderCall.h"
+#include "Providers.h"
 
 namespace ZV::Test {
-
-// One of the twelve providers, as a server knows it.
-struct Provider {
-  const char* prefix;  // of its create functions
-  const char* className;
-  InstanceProvider::Create createInstanceMI;
-  AssociationProvider::Create createAssociationMI = nullptr;  // null if it has none
-  MethodProvider::Create createMethodMI = nullptr;            // null if it has none
-  // For an association: its two references and an object of each end on the host with interfaces. For others: an object
-  // of the class.
-  const char* leftRole = nullptr;
-  Path left = {};
-  const char* rightRole = nullptr;
-  Path right = {};
-  Instance change = {};  // the changes of a modification; without properties if the class refuses it
-
-  bool isAssociation() const { return createAssociationMI != nullptr; }
-  // An object of the class: the association of its two ends, or the object that left names.
-  Path object() const;
-};
-
-const std::vector<Provider>& allProviders();
 
 enum class Kind { Read, Modify, Method, Refused };
 
