@@ -181,6 +181,10 @@ std::vector<Failure> furnish(RecordingBroker& broker, const std::vector<WrittenL
       broker.missingProperty = {static_cast<CMPIrc>(scanner.number("the rc")), CMPI_nullValue};
     } else if (scanner.take("marks keys")) {
       broker.stateOfKeys = CMPI_keyValue;
+    } else if (scanner.take("loses paths of")) {
+      const std::string victims = scanner.word("the class of the paths");
+      scanner.expect("at one of");
+      broker.loseHandles(victims, scanner.word("the class of the path"));
     } else {
       scanner.fail("an unknown part of a broker");
     }

@@ -329,6 +329,7 @@ void RecordingBroker::beginRequest() {
   const std::lock_guard lock(mutex_);
   calls_.clear();
   numbers_.clear();
+  pathsToLose_.clear();
 }
 
 void RecordingBroker::startOver() {
@@ -338,6 +339,8 @@ void RecordingBroker::startOver() {
   callCount_ = 0;
   hasFailed_ = false;
   numbers_.clear();
+  lossOfHandles_ = {};
+  pathsToLose_.clear();
 }
 
 std::size_t RecordingBroker::mark() const {
@@ -387,6 +390,17 @@ PathObject* RecordingBroker::addPath(Path path, const std::string& label) {
   object->ft = &ObjectTables::path;
   object->path = std::move(path);
   return add(std::move(object), "OP", label);
+}
+
+PathObject* RecordingBroker::addNewPath(Path path) {
+  const auto& [victims, occasion] = lossOfHandles_;
+  if (!occasion.empty() && path.className == occasion) {
+    for (PathObject* victim : pathsToLose_) victim->hdl = nullptr;
+  }
+  const bool isVictim = path.className == victims;
+  PathObject* object = addPath(std::move(path));
+  if (!victims.empty() && isVictim) pathsToLose_.push_back(object);
+  return object;
 }
 
 InstanceObject* RecordingBroker::addInstance(Instance instance, const std::string& label) {
@@ -460,7 +474,7 @@ CMPIObjectPath* BrokerEncapsulation::newObjectPath(const CMPIBroker* face, const
   RecordingBroker* broker = brokerOf(face);
   const Call call(broker, "newObjectPath", "newObjectPath", inQuotesOrNull(space) + ", " + inQuotesOrNull(name));
   const Path path(name == nullptr ? "" : name, space == nullptr ? "" : space);
-  return call.give([&] { return broker->addPath(path); }, rc);
+  return call.give([&] { return broker->addNewPath(path); }, rc);
 }
 
 CMPIArgs* BrokerEncapsulation::newArgs(const CMPIBroker* face, CMPIStatus* rc) {

@@ -347,6 +347,20 @@ TEST(RecordingBroker, ObjectsOfAnotherKindOfBrokerAreReadThroughTheirTables) {
   EXPECT_THAT(broker.calls().only({"returnInstance"}), ElementsAre("returnInstance(another broker's object)"));
 }
 
+TEST(RecordingBroker, PathsOfAClassLoseTheirHandlesWhenOneOfAnotherIsMade) {
+  RecordingBroker broker;
+  broker.loseHandles("ZORVA_X", "ZORVA_Y");
+  const auto make = [&](const char* name) { return CMNewObjectPath(broker.cmpi(), "root/cimv2", name, nullptr); };
+  const CMPIObjectPath* victim = make("ZORVA_X");
+  const CMPIObjectPath* other = make("ZORVA_Z");
+  EXPECT_NE(nullptr, victim->hdl);
+  const CMPIObjectPath* occasion = make("ZORVA_Y");
+  EXPECT_EQ(nullptr, victim->hdl);
+  EXPECT_NE(nullptr, other->hdl);
+  EXPECT_NE(nullptr, occasion->hdl);
+  EXPECT_NE(nullptr, make("ZORVA_X")->hdl);
+}
+
 TEST(RecordingBroker, CountsTheCallsOfSeveralThreads) {
   RecordingBroker broker;
   std::vector<std::thread> threads;
