@@ -144,20 +144,6 @@ TEST_F(AssociationTargets, WithoutAnAssociationClassOrAPathThereIsNoFarEnd) {
   EXPECT_THAT(messages(), ElementsAre(HasSubstr("Target Class is EMPTY")));
 }
 
-TEST_F(AssociationTargets, RightClassIsLoggedAtEntryAndExitAndDecidesNothing) {
-  EXPECT_EQ("ZORVA_ComputerSystem", targetOf("ZORVA_DNSProtocolEndPoint", "ZORVA_DNSHostedAccessPoint", "CIM_Any"));
-  const std::string list =
-      " get_assoc_targetClass_Name, _broker=ADDR ref=ADDR _RefLeftClass=ZORVA_DNSHostedAccessPoint"
-      " _RefRightClass=CIM_Any rc=ADDR";
-  EXPECT_THAT(
-      logger.pairs().ofFunction("get_assoc_targetClass_Name").briefs(),
-      ElementsAre("3000 ENTERING" + list, "4000 MESSAGE Target Class is ZORVA_ComputerSystem", "3000 EXITING" + list));
-  for (const LogLine& line : logger.pairs().ofFunction("get_assoc_targetClass_Name")) {
-    EXPECT_EQ("factory/AssociationTargets.cpp", line.file);
-    EXPECT_EQ("factory/AssociationTargets.cpp", line.fileInText());
-  }
-}
-
 TEST_F(AssociationTargets, ClassOfTheSourceIsReadOnceAndOneThatCannotBeReadLeadsNowhere) {
   const CMPIObjectPath* source = broker.make(Path("ZORVA_IPAssignmentSettingData"), "ref");
   broker.startOver();
@@ -181,28 +167,6 @@ TEST_F(AssociationTargets, FarEndPathHasTheSourcesNamespaceThisHostAndNoKeys) {
   const std::string list = ", _broker=ADDR ref=ADDR _RefLeftClass=ZORVA_DNSHostedAccessPoint _RefRightClass= rc=ADDR";
   EXPECT_THAT(logger.pairs().ofFunction("get_assoc_targetClass_ObjectPath").briefsWithCategory(),
               ElementsAre("Zorvagent.DNSObjFactory 3000 ENTERING get_assoc_targetClass_ObjectPath" + list));
-}
-
-TEST_F(AssociationTargets, NoPathIsMadeIfThereIsNoFarEnd) {
-  EXPECT_EQ(nullptr, pathOf(Path("ZORVA_ComputerSystem"), "ZORVA_DNSSAPSAPDependency"));
-  EXPECT_THAT(broker.calls().steps(), IsEmpty());
-}
-
-TEST_F(AssociationTargets, FarEndPathThatCouldNotBeMadeComesBackAsTheBrokerGaveItWithItsCode) {
-  const CMPIObjectPath* ref = broker.make(Path("ZORVA_ComputerSystem"));
-  const auto failing = [&](Mode mode) {
-    broker.failNext("newObjectPath", mode);
-    status = {CMPI_RC_OK, nullptr};
-    return DNSClientObjFactory().get_assoc_targetClass_ObjectPath(broker.cmpi(), ref, "ZORVA_DNSHostedAccessPoint",
-                                                                  nullptr, &status);
-  };
-  EXPECT_EQ(nullptr, failing(Mode::ReturnNull));
-  EXPECT_EQ(CMPI_RC_OK, status.rc);
-  EXPECT_EQ(nullptr, failing(Mode::RcAndNull));
-  EXPECT_EQ(CMPI_RC_ERR_FAILED, status.rc);
-  const CMPIObjectPath* lost = failing(Mode::NullHandle);
-  ASSERT_NE(nullptr, lost);
-  EXPECT_EQ(nullptr, lost->hdl);
 }
 
 // --- The endpoint of an interface
@@ -240,14 +204,6 @@ TEST_F(AssociationTargets, EndpointThatCouldNotBeMadeReplacesTheSlotAndIsNoFailu
   CMPIInstance* const lost = endpointOf("eth0", before);
   ASSERT_NE(nullptr, lost);
   EXPECT_EQ(nullptr, lost->hdl);
-}
-
-TEST_F(AssociationTargets, EndpointLookUpLogsItsParametersAtEntryAlone) {
-  endpointOf("eth0");
-  EXPECT_THAT(
-      logger.pairs().ofFunction("getDNSClientCMPIInstanceFromIPInterface").briefsWithCategory(),
-      ElementsAre("Zorvagent.DNSObjFactory 3000 ENTERING getDNSClientCMPIInstanceFromIPInterface, _broker=ADDR ref=ADDR"
-                  " interfaceName=ADDR instance=0 isObjPath=1 properties=0 rc=ADDR"));
 }
 
 // --- The factory's view of the host

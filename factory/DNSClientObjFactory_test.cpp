@@ -107,53 +107,6 @@ TEST_F(Factory, EndpointHasFifteenPropertiesInOrder) {
   EXPECT_EQ(CMPI_RC_OK, status.rc);
 }
 
-TEST_F(Factory, EndpointIsMadeCallByCall) {
-  world.host("host1").install();
-  const char* properties[] = {"EnabledState", "DNSSuffixesToAppend", nullptr};
-  broker.startOver();
-  make(usualClient(), properties);
-  EXPECT_THAT(
-      broker.calls().steps(),
-      ElementsAre("newObjectPath(\"root/cimv2\", \"ZORVA_DNSProtocolEndPoint\")", "OP1.setNameSpace(\"root/cimv2\")",
-                  "OP1.setHostname(\"host1\")", "newInstance(OP1)",
-                  "I1.setPropertyFilter({\"EnabledState\", \"DNSSuffixesToAppend\"}, {\"SystemCreationClassName\", "
-                  "\"CreationClassName\", \"SystemName\", \"Name\"})",
-                  "I1.setProperty(\"SystemCreationClassName\", chars \"ZORVA_ComputerSystem\")",
-                  "I1.setProperty(\"CreationClassName\", chars \"ZORVA_DNSProtocolEndPoint\")",
-                  "I1.setProperty(\"SystemName\", chars \"host1\")", "I1.setProperty(\"Name\", chars \"eth0\")",
-                  "newArray(2, string)", "newString(\"b.org\")", "A1.setElementAt(0, string \"b.org\")",
-                  "newString(\"a.org\")", "A1.setElementAt(1, string \"a.org\")",
-                  "I1.setProperty(\"DNSSuffixesToAppend\", string[] {\"b.org\", \"a.org\"})",
-                  "I1.setProperty(\"EnabledState\", uint16 2)"));
-}
-
-TEST_F(Factory, EndpointLogsItsSteps) {
-  world.host().install();
-  make(usualClient());
-  const LogLines lines = logger.pairs().ofCategory("Zorvagent.DNSObjFactory");
-  EXPECT_THAT(lines.briefs(),
-              ElementsAre("3000 ENTERING makeDNSClientInstance, broker=ADDR ref=ADDR dc=ADDR properties=0 isObjPath=0 "
-                          "rc=ADDR",
-                          "4000 VARIABLE dnsSuffixesSize = 2",
-                          "3000 EXITING makeDNSClientInstance, broker=ADDR ref=ADDR dc=ADDR properties=0 isObjPath=0 "
-                          "rc=ADDR"));
-  for (const LogLine& line : lines) {
-    EXPECT_EQ("makeDNSClientInstance", line.function);
-    EXPECT_EQ("factory/DNSClientObjFactory.cpp", line.file);
-    EXPECT_EQ("factory/DNSClientObjFactory.cpp", line.fileInText());
-    EXPECT_EQ(line.line, line.lineInText());
-  }
-}
-
-TEST_F(Factory, EndpointOfTheServiceProcessorHasASystemWithAFixedName) {
-  world.host("host1").install();
-  DNSClient client = usualClient();
-  client.setDNSSCCN("ZORVA_SPComputerSystem");
-  const Instance instance = RecordingBroker::read(make(client));
-  EXPECT_EQ(chars("ZORVA_SPComputerSystem"), instance["SystemCreationClassName"]);
-  EXPECT_EQ(chars("BMC:-1"), instance["SystemName"]);
-}
-
 TEST_F(Factory, ClassOfTheHostIsKnownInAnyCase) {
   world.host("host1").install();
   DNSClient client = usualClient();
@@ -194,22 +147,6 @@ TEST_F(Factory, SuffixesAreCountedIn16Bits) {
   EXPECT_EQ(3U, RecordingBroker::read(make(client))["DNSSuffixesToAppend"].elements().size());
 }
 
-TEST_F(Factory, EndpointWhoseArrayCannotBeMadeLacksItsLastProperties) {
-  world.host().install();
-  const std::pair<Mode, CMPIrc> rows[] = {{Mode::ReturnNull, CMPI_RC_OK}, {Mode::RcAndNull, CMPI_RC_ERR_FAILED}};
-  for (const auto& [mode, rc] : rows) {
-    logger.clear();
-    broker.failNext("newArray", mode);
-    const Instance instance = RecordingBroker::read(make(usualClient()));
-    EXPECT_EQ(rc, status.rc);
-    EXPECT_EQ("DomainName", instance.names().back());
-    EXPECT_EQ(12U, instance.properties.size());
-    EXPECT_THAT(logger.pairs().errors(), ElementsAre("Create Array for Property DNSSuffixesToAppend failed."));
-    EXPECT_EQ("makeDNSClientInstance", logger.pairs().back().function);
-    EXPECT_FALSE(logger.pairs().exited("makeDNSClientInstance"));
-  }
-}
-
 TEST_F(Factory, ArrayWithoutAHandleIsSkipped) {
   world.host().install();
   broker.failNext("newArray", Mode::NullHandle);
@@ -230,17 +167,6 @@ TEST_F(Factory, SuffixThatCannotBeMadeLeavesItsElementUnset) {
     EXPECT_EQ(1U, broker.callsOf("setElementAt")) << nameOf(mode);
     broker.startOver();
   }
-}
-
-TEST_F(Factory, StatusOfTheLastElementIsKept) {
-  world.host().install();
-  broker.failEach("setElementAt", Mode::SetRc);
-  EXPECT_EQ(texts({}).type, RecordingBroker::read(make(usualClient()))["DNSSuffixesToAppend"].type);
-  EXPECT_EQ(CMPI_RC_ERR_FAILED, status.rc);
-  broker.startOver();
-  broker.failNext("setElementAt", Mode::SetRc);
-  make(usualClient());
-  EXPECT_EQ(CMPI_RC_OK, status.rc);
 }
 
 // --- server instances
@@ -269,63 +195,6 @@ TEST_F(Factory, ServerWithAnIPv6AddressHasItThroughout) {
   const Instance instance = RecordingBroker::read(make(usualServer("2001:db8::53")));
   for (const char* name : {"Name", "AccessInfo", "ElementName"}) EXPECT_EQ(chars("2001:db8::53"), instance[name]);
   EXPECT_EQ(uint16(4), instance["InfoFormat"]);
-}
-
-TEST_F(Factory, ServerIsMadeCallByCall) {
-  world.host("host1").install();
-  const char* properties[] = {"InfoFormat", nullptr};
-  broker.startOver();
-  make(usualServer(), properties);
-  EXPECT_THAT(
-      broker.calls().steps(),
-      ElementsAre("newObjectPath(\"root/cimv2\", \"ZORVA_RemoteServiceAccessPoint\")",
-                  "OP1.setNameSpace(\"root/cimv2\")", "OP1.setHostname(\"host1\")", "newInstance(OP1)",
-                  "I1.setPropertyFilter({\"InfoFormat\"}, {\"SystemCreationClassName\", "
-                  "\"CreationClassName\", \"SystemName\", \"Name\"})",
-                  "I1.setProperty(\"SystemCreationClassName\", chars \"ZORVA_ComputerSystem\")",
-                  "I1.setProperty(\"CreationClassName\", chars \"ZORVA_RemoteServiceAccessPoint\")",
-                  "I1.setProperty(\"SystemName\", chars \"host1\")", "I1.setProperty(\"Name\", chars \"192.0.2.53\")",
-                  "I1.setProperty(\"InfoFormat\", uint16 3)"));
-}
-
-TEST_F(Factory, ServerLogsItsSteps) {
-  world.host().install();
-  make(usualServer(), nullptr, true);
-  EXPECT_THAT(logger.pairs().ofCategory("Zorvagent.DNSObjFactory").briefs(),
-              ElementsAre("3000 ENTERING makeDNSServerInstance, broker=ADDR ref=ADDR ds=ADDR properties=0 isObjPath=1 "
-                          "rc=ADDR",
-                          "3000 EXITING makeDNSServerInstance, broker=ADDR ref=ADDR ds=ADDR properties=0 isObjPath=1 "
-                          "rc=ADDR"));
-}
-
-TEST_F(Factory, ServerThatIsNotMadeIsLeftWithoutAnExitLine) {
-  world.host().install();
-  for (const char* call : {"newObjectPath", "newInstance"}) {
-    for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
-      logger.clear();
-      broker.failNext(call, mode);
-      const CMPIInstance* instance = make(usualServer());
-      const bool comesBackBare = mode == Mode::NullHandle && call == std::string("newInstance");
-      EXPECT_EQ(comesBackBare, instance != nullptr);
-      EXPECT_FALSE(logger.pairs().exited("makeDNSServerInstance"));
-      EXPECT_EQ(CMPI_RC_OK, status.rc);  // both calls are given no status
-    }
-  }
-}
-
-TEST_F(Factory, EndpointThatIsNotMadeIsLeftWithAnExitLine) {
-  world.host().install();
-  for (const char* call : {"newObjectPath", "newInstance"}) {
-    for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
-      logger.clear();
-      broker.failNext(call, mode);
-      const CMPIInstance* instance = make(usualClient());
-      const bool comesBackBare = mode == Mode::NullHandle && call == std::string("newInstance");
-      EXPECT_EQ(comesBackBare, instance != nullptr);
-      EXPECT_TRUE(logger.pairs().exited("makeDNSClientInstance"));
-      EXPECT_EQ(CMPI_RC_OK, status.rc);
-    }
-  }
 }
 
 // --- which properties an instance has, alike for both classes
@@ -437,114 +306,7 @@ INSTANTIATE_TEST_SUITE_P(Of, Selection,
                          ::testing::Values(Kind{"Endpoint", 15, makeEndpoint}, Kind{"Server", 12, makeServer}),
                          [](const auto& row) { return std::string(row.param.name); });
 
-// --- the functions over all and over one
-
-TEST_F(Factory, FunctionsLogTheirArgumentsAtEntryAndExit) {
-  world.nic("eth0", {.servers = {"192.0.2.1"}}).install();
-  DNSClientObjFactory factory;
-  std::vector<CMPIObjectPath*> paths;
-  std::vector<CMPIInstance*> instances;
-  logger.clear();
-  factory.getAllDNSClientCMPIObjPaths(broker.cmpi(), ref(), paths, &status);
-  factory.getAllDNSServerCMPIObjPaths(broker.cmpi(), ref(), paths, &status);
-  factory.getAllDNSClientCMPIInstances(broker.cmpi(), ref(), nullptr, true, instances, &status);
-  factory.getAllDNSServerCMPIInstances(broker.cmpi(), ref(), nullptr, true, instances, &status);
-  factory.getOneDNSClientCMPIInstance(broker.cmpi(), ref(), broker.makeString("eth0"), nullptr, instances, &status);
-  factory.getOneDNSServerCMPIInstance(broker.cmpi(), ref(), broker.makeString("192.0.2.1"), nullptr, instances,
-                                      &status);
-  std::vector<std::string> lines;
-  for (const LogLine& line : logger.pairs()) {
-    if (!line.function.starts_with("make")) lines.push_back(line.brief());
-  }
-  const std::string pathArguments = ", broker=ADDR ref=ADDR objectPaths=ADDR status=ADDR";
-  const std::string allArguments = ", broker=ADDR ref=ADDR properties=0 isObjPath=1 instances=ADDR rc=ADDR";
-  const std::string oneArguments = ", broker=ADDR objectPath=ADDR key=ADDR properties=0 instances=ADDR status=ADDR";
-  EXPECT_THAT(
-      lines, ElementsAre("3000 ENTERING getAllDNSClientCMPIObjPaths" + pathArguments,  // the function that logs no exit
-                         "3000 ENTERING getAllDNSServerCMPIObjPaths" + pathArguments,
-                         "3000 EXITING getAllDNSServerCMPIObjPaths" + pathArguments,
-                         "3000 ENTERING getAllDNSClientCMPIInstances" + allArguments,
-                         "3000 EXITING getAllDNSClientCMPIInstances" + allArguments,
-                         "3000 ENTERING getAllDNSServerCMPIInstances" + allArguments,
-                         "3000 EXITING getAllDNSServerCMPIInstances" + allArguments,
-                         "3000 ENTERING getOneDNSClientCMPIInstance" + oneArguments,
-                         "3000 EXITING getOneDNSClientCMPIInstance" + oneArguments,
-                         "3000 ENTERING getOneDNSServerCMPIInstance" + oneArguments,
-                         "3000 EXITING getOneDNSServerCMPIInstance" + oneArguments));
-  EXPECT_EQ(2U, paths.size());
-  EXPECT_EQ(4U, instances.size());
-}
-
-TEST_F(Factory, EmptyMapsAreFailuresThatTouchNoStatus) {
-  world.host().install();
-  DNSClientObjFactory factory;
-  std::vector<CMPIObjectPath*> paths;
-  std::vector<CMPIInstance*> instances;
-  status.rc = CMPI_RC_ERR_ACCESS_DENIED;
-  EXPECT_EQ(1, factory.getAllDNSClientCMPIObjPaths(broker.cmpi(), ref(), paths, &status));
-  EXPECT_EQ(1, factory.getAllDNSServerCMPIObjPaths(broker.cmpi(), ref(), paths, &status));
-  EXPECT_EQ(1, factory.getAllDNSClientCMPIInstances(broker.cmpi(), ref(), nullptr, false, instances, &status));
-  EXPECT_EQ(1, factory.getAllDNSServerCMPIInstances(broker.cmpi(), ref(), nullptr, false, instances, &status));
-  EXPECT_EQ(CMPI_RC_ERR_ACCESS_DENIED, status.rc);
-  EXPECT_EQ(0U, broker.callCount());
-  const LogLines lines = logger.pairs();
-  EXPECT_THAT(lines.errors(), ElementsAre("No ObjectPath Found", "No ObjectPath found", "***No instance found***",
-                                          "***No instance found***"));
-  EXPECT_TRUE(lines.exited("getAllDNSClientCMPIInstances"));  // the function that logs its exit
-  EXPECT_FALSE(lines.exited("getAllDNSServerCMPIInstances"));
-  EXPECT_FALSE(lines.exited("getAllDNSClientCMPIObjPaths"));
-  EXPECT_FALSE(lines.exited("getAllDNSServerCMPIObjPaths"));
-}
-
-TEST_F(Factory, PathThatIsNotMadeKeepsTheEarlierOnes) {
-  world.nic("eth0", {.servers = {"192.0.2.1", "192.0.2.2"}}).nic("eth1").install();
-  DNSClientObjFactory factory;
-  for (const bool ofServers : {false, true}) {
-    logger.clear();
-    std::vector<CMPIObjectPath*> paths;
-    // The namespace and its text, then seven calls for the first path.
-    CMPIObjectPath* given = ref();
-    broker.failAt(10, Mode::RcAndNull);
-    const int result = ofServers ? factory.getAllDNSServerCMPIObjPaths(broker.cmpi(), given, paths, &status)
-                                 : factory.getAllDNSClientCMPIObjPaths(broker.cmpi(), given, paths, &status);
-    EXPECT_EQ(2, result);
-    EXPECT_EQ(CMPI_RC_ERR_FAILED, status.rc);
-    ASSERT_EQ(1U, paths.size());
-    EXPECT_EQ(4U, RecordingBroker::read(paths[0]).keys.size());
-    EXPECT_EQ(LineKind::Message, logger.pairs().back().kind());  // no exit line
-  }
-}
-
-TEST_F(Factory, UnknownNameIsLoggedWithoutAnExitLine) {
-  world.nic("eth0", {.servers = {"192.0.2.1"}}).install();
-  DNSClientObjFactory factory;
-  logger.clear();
-  std::vector<CMPIInstance*> instances;
-  EXPECT_EQ(1, factory.getOneDNSClientCMPIInstance(broker.cmpi(), ref(), broker.makeString("ETH0"), nullptr, instances,
-                                                   &status));
-  EXPECT_EQ(1, factory.getOneDNSServerCMPIInstance(broker.cmpi(), ref(), broker.makeString("192.0.2.10"), nullptr,
-                                                   instances, &status));
-  EXPECT_THAT(instances, IsEmpty());
-  EXPECT_THAT(logger.pairs().errors(),
-              ElementsAre("No DNSClient instance found in the Map", "No DNS Server instance found in the map"));
-  EXPECT_THAT(logger.pairs().ofKind(LineKind::Exiting), IsEmpty());
-}
-
-TEST_F(Factory, InstanceThatIsNotMadeIsInTheResult) {
-  world.nic("eth0", {.servers = {"192.0.2.1"}}).install();
-  DNSClientObjFactory factory;
-  std::vector<CMPIInstance*> instances;
-  broker.failEach("newInstance", Mode::ReturnNull);
-  EXPECT_EQ(0, factory.getAllDNSClientCMPIInstances(broker.cmpi(), ref(), nullptr, false, instances, &status));
-  EXPECT_EQ(0, factory.getAllDNSServerCMPIInstances(broker.cmpi(), ref(), nullptr, false, instances, &status));
-  EXPECT_EQ(0, factory.getOneDNSClientCMPIInstance(broker.cmpi(), ref(), broker.makeString("eth0"), nullptr, instances,
-                                                   &status));
-  EXPECT_EQ(0, factory.getOneDNSServerCMPIInstance(broker.cmpi(), ref(), broker.makeString("192.0.2.1"), nullptr,
-                                                   instances, &status));
-  EXPECT_EQ(std::vector<CMPIInstance*>(4, nullptr), instances);
-}
-
-// --- the position of a server
+// --- the place of a server
 
 class Place : public Factory {
  protected:
@@ -585,16 +347,6 @@ TEST_F(Place, WithoutANameIsOneWithTheStatusOfTheKey) {
   EXPECT_EQ(1, placeOf(Path("ZORVA_RemoteServiceAccessPoint")));
   EXPECT_EQ(CMPI_RC_ERR_NOT_FOUND, status.rc);
   EXPECT_EQ(1, placeOf(nullptr));
-}
-
-TEST_F(Place, SurvivesEveryFailureOfTheBroker) {
-  world.nic("eth0", {.servers = {"192.0.2.9", "192.0.2.1"}}).install();
-  const std::size_t tried = forEachFailure(broker, [&](std::size_t, Mode mode) {
-    const int place = placeOf(server("192.0.2.1"));
-    const bool nameIsRead = !broker.hasFailed() || mode == Mode::SetRc;
-    EXPECT_EQ(nameIsRead ? 2 : 1, place) << nameOf(mode);
-  });
-  EXPECT_EQ(8U, tried);
 }
 
 }  // namespace

@@ -14,7 +14,6 @@ using std::string_literals::operator""s;
 using ::testing::Contains;
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
-using ::testing::Not;
 using ::testing::SizeIs;
 
 constexpr const char* kClass = "ZORVA_DNSGeneralSettingData";
@@ -129,48 +128,13 @@ TEST_F(DNSGeneralSettingDataObjectsTest, SuffixesAreCountedInSixteenBits) {
   EXPECT_EQ(texts({"0", "1"}), made()["DNSSuffixesToAppend"]);
 }
 
-TEST_F(DNSGeneralSettingDataObjectsTest, EachSuffixIsLogged) {
-  world_->file("eth0", "DNSSUFFIXES=a b \n");
-  make({"DNSSuffixesToAppend"});
-  const LogLines told = lines().ofKind(LineKind::Variable);
-  EXPECT_THAT(told.briefs(), ElementsAre("4000 VARIABLE dnsSuf = a", "4000 VARIABLE dnsSuf = b"));
-  EXPECT_EQ("makeDNSGeneralSettingDataInstance", told.at(0).function);
-  EXPECT_EQ("factory/DNSGeneralSettingDataObjects.cpp", told.at(0).file);
-}
-
 // --- failures of the broker
-
-TEST_F(DNSGeneralSettingDataObjectsTest, APathOrAnInstanceThatCannotBeMadeIsNotLogged) {
-  for (const char* name : {"newObjectPath", "newInstance"}) {
-    for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
-      broker_.startOver();
-      broker_.failNext(name, mode);
-      const CMPIInstance* instance = make();
-      EXPECT_EQ(name == "newInstance"s && mode == Mode::NullHandle, instance != nullptr) << name << " " << nameOf(mode);
-      EXPECT_EQ(0U, broker_.callsOf("setProperty"));
-      EXPECT_THAT(lines().errors(), IsEmpty());
-      EXPECT_FALSE(lines().exited("makeDNSGeneralSettingDataInstance"));
-      EXPECT_EQ(CMPI_RC_OK, status_.rc);
-    }
-  }
-}
 
 TEST_F(DNSGeneralSettingDataObjectsTest, PathAndInstanceAreMadeWithoutTheStatus) {
   for (const char* name : {"newObjectPath", "newInstance", "getNameSpace"}) {
     broker_.failNext(name, Mode::SetRc);
     EXPECT_EQ(kAllProperties, made().names());
     EXPECT_EQ(CMPI_RC_OK, status_.rc) << name;
-  }
-}
-
-TEST_F(DNSGeneralSettingDataObjectsTest, AnArrayThatCannotBeMadeEndsTheWork) {
-  for (const Mode mode : {Mode::ReturnNull, Mode::RcAndNull}) {
-    broker_.failNext("newArray", mode);
-    EXPECT_THAT(made().names(), Not(Contains("DNSSuffixesToAppend")));
-    EXPECT_THAT(lines().errors(), ElementsAre("Create Array for Property DNSSuffixesToAppend failed."));
-    EXPECT_EQ("makeDNSGeneralSettingDataInstance", lines().back().function);
-    EXPECT_FALSE(lines().exited("makeDNSGeneralSettingDataInstance"));
-    EXPECT_EQ(mode == Mode::RcAndNull ? CMPI_RC_ERR_FAILED : CMPI_RC_OK, status_.rc);
   }
 }
 
@@ -182,27 +146,6 @@ TEST_F(DNSGeneralSettingDataObjectsTest, ASuffixWhoseStringFailsLeavesItsElement
     EXPECT_THAT(lines().errors(), IsEmpty());
     EXPECT_TRUE(lines().exited("makeDNSGeneralSettingDataInstance"));
   }
-}
-
-TEST_F(DNSGeneralSettingDataObjectsTest, WhateverTheBrokerFailsAtNothingBreaks) {
-  const CMPIObjectPath* ref = broker_.make(Path(kClass).key("InstanceID", "x"));
-  const std::size_t tried = forEachFailure(
-      broker_,
-      [&](std::size_t, Mode mode) {
-        Instances instances;
-        Paths paths;
-        try {
-          EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIInstances(broker_.cmpi(), ref, nullptr, &instances, &status_));
-          EXPECT_EQ(0, getOneDNSGeneralSettingDataCMPIInstance(broker_.cmpi(), ref, nullptr, &instances, &status_));
-          EXPECT_THAT(instances, SizeIs(2));
-          const auto failed = getAllDNSGeneralSettingDataCMPIObjectPaths(broker_.cmpi(), ref, &paths, &status_);
-          EXPECT_EQ(failed == 0, paths.size() == 1);
-        } catch (const InjectedFailure&) {
-          EXPECT_EQ(Mode::Throw, mode);
-        }
-      },
-      {Mode::SetRc, Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull, Mode::Throw});
-  EXPECT_GT(tried, 150U);
 }
 
 // --- all, one, and paths
@@ -226,18 +169,6 @@ TEST_F(DNSGeneralSettingDataObjectsTest, ThePathHasTheKeyOfTheInstanceTheNamespa
             RecordingBroker::read(paths[0]));
 }
 
-TEST_F(DNSGeneralSettingDataObjectsTest, WithoutAnInterfaceOfTheHostThereIsNeitherInstanceNorPath) {
-  newWorld().bmc().nic("bmc0", usualNic()).install();
-  Instances instances;
-  Paths paths;
-  EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIInstances(broker_.cmpi(), ref_, nullptr, &instances, &status_));
-  EXPECT_EQ(0, getOneDNSGeneralSettingDataCMPIInstance(broker_.cmpi(), ref_, nullptr, &instances, &status_));
-  EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIObjectPaths(broker_.cmpi(), ref_, &paths, &status_));
-  EXPECT_THAT(instances, IsEmpty());
-  EXPECT_THAT(paths, IsEmpty());
-  EXPECT_THAT(lines().errors(), IsEmpty());
-}
-
 TEST_F(DNSGeneralSettingDataObjectsTest, TheKeyIsReadAndComparedWithNothing) {
   for (const Path& path :
        {Path(kClass).key("InstanceID", "dnsgen1:elsewhere"), Path(kClass).key("InstanceID", ""), Path(kClass)}) {
@@ -250,39 +181,6 @@ TEST_F(DNSGeneralSettingDataObjectsTest, TheKeyIsReadAndComparedWithNothing) {
     EXPECT_EQ(chars("dnsgen1:myhost"), RecordingBroker::read(instances[0])["InstanceID"]);
     EXPECT_TRUE(lines().exited("getOneDNSGeneralSettingDataCMPIInstance"));
   }
-}
-
-TEST_F(DNSGeneralSettingDataObjectsTest, AnInstanceThatCannotBeMadeIsInTheResultAsNull) {
-  Instances instances;
-  broker_.failEach("newObjectPath", Mode::ReturnNull);
-  EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIInstances(broker_.cmpi(), ref_, nullptr, &instances, &status_));
-  EXPECT_EQ(0, getOneDNSGeneralSettingDataCMPIInstance(broker_.cmpi(), ref_, nullptr, &instances, &status_));
-  EXPECT_THAT(instances, ElementsAre(nullptr, nullptr));
-}
-
-TEST_F(DNSGeneralSettingDataObjectsTest, APathThatCannotBeMadeIsLogged) {
-  for (const Mode mode : {Mode::ReturnNull, Mode::NullHandle, Mode::RcAndNull}) {
-    logger_.clear();
-    broker_.failNext("newObjectPath", mode);
-    Paths paths;
-    EXPECT_EQ(1, getAllDNSGeneralSettingDataCMPIObjectPaths(broker_.cmpi(), ref_, &paths, &status_));
-    EXPECT_THAT(paths, IsEmpty());
-    EXPECT_THAT(lines().errors(), ElementsAre("getAllDNSGeneralSettingDataCMPIObjectPaths failed"));
-    EXPECT_TRUE(lines().exited("getAllDNSGeneralSettingDataCMPIObjectPaths"));
-    EXPECT_EQ(CMPI_RC_OK, status_.rc);
-  }
-}
-
-TEST_F(DNSGeneralSettingDataObjectsTest, ATreeThatCannotBeReadIsAHostWithoutInterfaces) {
-  world_->installUnreadable();
-  Instances instances;
-  Paths paths;
-  EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIInstances(broker_.cmpi(), ref_, nullptr, &instances, &status_));
-  EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIObjectPaths(broker_.cmpi(), ref_, &paths, &status_));
-  EXPECT_THAT(instances, IsEmpty());
-  EXPECT_THAT(paths, IsEmpty());
-  EXPECT_THAT(logger_.pairs().errors(),
-              ElementsAre("Select Node for NetworkIPConfig failed", "Select Node for NetworkIPConfig failed"));
 }
 
 TEST_F(DNSGeneralSettingDataObjectsTest, WithoutABrokerOrAPathNothingBreaks) {

@@ -48,14 +48,6 @@ class EachModification : public ::testing::TestWithParam<Modification> {
   CMPIStatus status_ = {CMPI_RC_OK, nullptr};
 };
 
-TEST_P(EachModification, OpensWithItsParameters) {
-  modify(Instance(GetParam().className));
-  EXPECT_EQ(
-      std::string("3000 ENTERING ") + GetParam().name + ", broker=ADDR ref=ADDR properties=0 instance=ADDR status=ADDR",
-      lines().at(0).brief());
-  EXPECT_EQ("factory/InstanceModification.cpp", lines().at(0).file);
-}
-
 TEST_P(EachModification, RefusesAnInstanceThatIsMissingOrHasNoHandle) {
   CMPIInstance* withoutHandle = broker_.make(Instance(GetParam().className).with("ConfigurationName", "home"));
   withoutHandle->hdl = nullptr;
@@ -104,12 +96,6 @@ class InstanceModification : public ::testing::Test {
   const Instance general_{"ZORVA_DNSGeneralSettingData"};
 };
 
-TEST_F(InstanceModification, OfTheSettingDataIsDoneWhateverTheBrokerSaysOfAMissingName) {
-  EXPECT_EQ(0U, modifySetting(setting_));
-  EXPECT_EQ(broker_.missingProperty.rc, status_.rc);
-  EXPECT_FALSE(logger_.pairs().exited("modifyDNSSettingDataCMPIInstance"));
-}
-
 TEST_F(InstanceModification, OfTheSettingDataSaysWhatWasRefusedByItsNumberAndLeavesTheStatus) {
   EXPECT_EQ(4U, modifySetting(setting_.with("RequestedHostname", "a b")));
   EXPECT_EQ(4U, modifySetting(setting_.with("DomainName", "a b")));
@@ -117,14 +103,7 @@ TEST_F(InstanceModification, OfTheSettingDataSaysWhatWasRefusedByItsNumberAndLea
   EXPECT_THAT(logger_.pairs().errors(), IsEmpty());
 }
 
-TEST_F(InstanceModification, OfTheSettingDataFailsWithoutALogLineIfNoInterfaceHasTheKey) {
-  EXPECT_EQ(1U,
-            modify(modifyDNSSettingDataCMPIInstance, Path("ZORVA_DNSSettingData").key("InstanceID", "x"), setting_));
-  EXPECT_THAT(logger_.pairs().errors(), IsEmpty());
-  EXPECT_TRUE(logger_.pairs().exited("modifyDNSSettingDataCMPIInstance"));
-}
-
-TEST_F(InstanceModification, OfTheGeneralDataFailsIfNeitherPropertyIsThere) {
+TEST_F(InstanceModification, OfTheGeneralDataFailsWhereNeitherPropertyIsThere) {
   EXPECT_EQ(1U, modifyGeneral(general_));
   EXPECT_EQ(1U, modifyGeneral(general_.with("DNSSuffixesToAppend", "no array")));
   EXPECT_EQ(0U, modifyGeneral(general_.with("DNSSuffixesToAppend", texts({"a"}))));

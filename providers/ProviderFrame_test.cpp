@@ -121,7 +121,56 @@ TEST_P(EveryProvider, LatestCreationsBrokerServesAllItsTables) {
   EXPECT_LT(0U, later.callsOf("newObjectPath"));
 }
 
-TEST_P(EveryAssociationProvider, ReturnsItsTable) {
+// A host with an interface, and what can be null in a request of it.
+class NullArguments {
+ public:
+  NullArguments() { world_.host().nic("eth0", usualNic()).install(); }
+
+  // Runs a request with each combination of a good path, one without a handle or none, and a result or none.
+  template <typename Request>
+  void forEach(const Path& path, const Request& request) {
+    CMPIObjectPath* bare = broker.make(path);
+    bare->hdl = nullptr;
+    for (const CMPIObjectPath* ref : {broker.make(path), bare, static_cast<CMPIObjectPath*>(nullptr)}) {
+      for (const CMPIResult* result : {broker.makeResult(), static_cast<CMPIResult*>(nullptr)}) request(ref, result);
+    }
+  }
+
+  RecordingBroker broker;
+
+ private:
+  World world_;
+};
+
+TEST_P(EveryProvider, NullPathResultOrBrokerNeverEndsTheProcess) {
+  NullArguments with;
+  for (const CMPIBroker* given : {with.broker.cmpi(), static_cast<const CMPIBroker*>(nullptr)}) {
+    CMPIInstanceMI* const mi = GetParam().createInstanceMI(given, nullptr, nullptr);
+    with.forEach(GetParam().object(), [mi](const CMPIObjectPath* ref, const CMPIResult* result) {
+      EXPECT_EQ(nullptr, mi->ft->enumerateInstanceNames(mi, nullptr, result, ref).msg);
+      EXPECT_EQ(nullptr, mi->ft->enumerateInstances(mi, nullptr, result, ref, nullptr).msg);
+      EXPECT_EQ(nullptr, mi->ft->getInstance(mi, nullptr, result, ref, nullptr).msg);
+    });
+  }
+}
+
+TEST_P(EveryAssociationProvider, NullPathResultOrBrokerNeverEndsTheProcess) {
+  NullArguments with;
+  const char* const own = GetParam().className;
+  for (const CMPIBroker* given : {with.broker.cmpi(), static_cast<const CMPIBroker*>(nullptr)}) {
+    CMPIAssociationMI* const mi = GetParam().createAssociationMI(given, nullptr, nullptr);
+    for (const Path& source : {GetParam().left, GetParam().right}) {
+      with.forEach(source, [mi, own](const CMPIObjectPath* ref, const CMPIResult* result) {
+        mi->ft->associators(mi, nullptr, result, ref, own, nullptr, nullptr, nullptr, nullptr);
+        mi->ft->associatorNames(mi, nullptr, result, ref, own, nullptr, nullptr, nullptr);
+        mi->ft->references(mi, nullptr, result, ref, nullptr, nullptr, nullptr);
+        mi->ft->referenceNames(mi, nullptr, result, ref, nullptr, nullptr);
+      });
+    }
+  }
+}
+
+TEST_P(EveryAssociationProvider, HandsOutItsTable) {
   CMPIStatus status{CMPI_RC_ERR_FAILED, nullptr};
   CMPIAssociationMI* const mi = GetParam().createAssociationMI(broker.cmpi(), nullptr, &status);
   EXPECT_EQ(CMPI_RC_ERR_FAILED, status.rc);
