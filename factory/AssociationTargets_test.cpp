@@ -1,10 +1,10 @@
-#include <gmock/gmock.h>
 
 #include <optional>
 #include <set>
 #include <string>
 #include <utility>
 
+#include "Matchers.h"
 #include "RecordingBroker.h"
 #include "RecordingLogger.h"
 #include "World.h"
@@ -12,10 +12,6 @@
 
 namespace ZV::Test {
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
-using ::testing::IsEmpty;
 
 struct Row {
   const char* source;

@@ -1,20 +1,14 @@
 #include "factory/DNSClientObjFactory.h"
 
-#include <RecordingBroker.h>
-#include <RecordingLogger.h>
-#include <World.h>
-#include <gmock/gmock.h>
-
 #include <functional>
+
+#include "Matchers.h"
+#include "RecordingBroker.h"
+#include "RecordingLogger.h"
+#include "World.h"
 
 namespace ZV::Test {
 namespace {
-
-using ::testing::AllOf;
-using ::testing::Contains;
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
-using ::testing::IsEmpty;
 
 class Factory : public ::testing::Test {
  protected:
@@ -305,6 +299,37 @@ TEST_P(Selection, IsTakenOverIntoTheNamespaceOfThePathThatWasGiven) {
 INSTANTIATE_TEST_SUITE_P(Of, Selection,
                          ::testing::Values(Kind{"Endpoint", 15, makeEndpoint}, Kind{"Server", 12, makeServer}),
                          [](const auto& row) { return std::string(row.param.name); });
+
+// --- the functions over all and over one
+
+TEST_F(Factory, NothingToGiveIsFailureOne) {
+  world.host().install();
+  DNSClientObjFactory factory;
+  std::vector<CMPIObjectPath*> paths;
+  std::vector<CMPIInstance*> instances;
+  CMPIString* name = broker.makeString("eth0");
+  EXPECT_EQ(1, factory.getAllDNSClientCMPIObjPaths(broker.cmpi(), ref(), paths, &status));
+  EXPECT_EQ(1, factory.getAllDNSServerCMPIObjPaths(broker.cmpi(), ref(), paths, &status));
+  EXPECT_EQ(1, factory.getAllDNSClientCMPIInstances(broker.cmpi(), ref(), nullptr, false, instances, &status));
+  EXPECT_EQ(1, factory.getAllDNSServerCMPIInstances(broker.cmpi(), ref(), nullptr, false, instances, &status));
+  EXPECT_EQ(1, factory.getOneDNSClientCMPIInstance(broker.cmpi(), ref(), name, nullptr, instances, &status));
+  EXPECT_EQ(1, factory.getOneDNSServerCMPIInstance(broker.cmpi(), ref(), name, nullptr, instances, &status));
+  EXPECT_EQ(CMPI_RC_OK, status.rc);
+}
+
+TEST_F(Factory, PathThatIsNotMadeIsFailureTwoAndKeepsTheEarlierOnes) {
+  world.nic("eth0", {.servers = {"192.0.2.1", "192.0.2.2"}}).nic("eth1").install();
+  DNSClientObjFactory factory;
+  for (const bool ofServers : {false, true}) {
+    std::vector<CMPIObjectPath*> paths;
+    CMPIObjectPath* given = ref();
+    broker.failAt(10, Mode::RcAndNull);  // the namespace and its text, then seven calls for the first path
+    EXPECT_EQ(2, ofServers ? factory.getAllDNSServerCMPIObjPaths(broker.cmpi(), given, paths, &status)
+                           : factory.getAllDNSClientCMPIObjPaths(broker.cmpi(), given, paths, &status));
+    ASSERT_EQ(1U, paths.size());
+    EXPECT_EQ(4U, RecordingBroker::read(paths[0]).keys.size());
+  }
+}
 
 // --- the place of a server
 

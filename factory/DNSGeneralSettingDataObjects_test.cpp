@@ -1,23 +1,13 @@
 #include "factory/DNSGeneralSettingDataObjects.h"
 
-#include <gmock/gmock.h>
-
-#include <memory>
-
-#include "ProviderCall.h"
-#include "World.h"
+#include "factory/testing/SettingObjectsTest.h"
 
 namespace ZV::Test {
 namespace {
 
 using std::string_literals::operator""s;
-using ::testing::Contains;
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-using ::testing::SizeIs;
 
 constexpr const char* kClass = "ZORVA_DNSGeneralSettingData";
-constexpr const char* kLogger = "Zorvagent.DNSObjFactory";
 
 const std::vector<std::string> kAllProperties = {
     "InstanceID", "Caption", "Description", "ElementName", "ConfigurationName", "AddressOrigin", "DNSSuffixesToAppend"};
@@ -25,32 +15,9 @@ const std::vector<std::string> kAllProperties = {
 using Instances = std::vector<CMPIInstance*>;
 using Paths = std::vector<CMPIObjectPath*>;
 
-class DNSGeneralSettingDataObjectsTest : public ::testing::Test {
+class DNSGeneralSettingDataObjectsTest : public SettingObjectsTest<DNSGeneralSettingData> {
  protected:
-  DNSGeneralSettingDataObjectsTest() { world_->host("myhost").nic("eth0", usualNic()).install(); }
-
-  // An empty host instead of the one with a usual interface.
-  World& newWorld() {
-    world_.reset();
-    world_ = std::make_unique<World>();
-    return *world_;
-  }
-  CMPIInstance* make(PropertyList properties = nullptr, bool isObjPath = false) {
-    DNSGeneralSettingData data;
-    EXPECT_TRUE(static_cast<bool>(data));
-    logger_.clear();
-    return makeDNSGeneralSettingDataInstance(broker_.cmpi(), ref_, data, properties.cmpi(), isObjPath, &status_);
-  }
-  Instance made(PropertyList properties = nullptr, bool isObjPath = false) {
-    return RecordingBroker::read(make(std::move(properties), isObjPath));
-  }
-  LogLines lines() const { return logger_.pairs().ofCategory(kLogger); }
-
-  std::unique_ptr<World> world_ = std::make_unique<World>();
-  RecordingLogger logger_;
-  RecordingBroker broker_;
-  CMPIObjectPath* ref_ = broker_.make(Path(kClass), "ref");
-  CMPIStatus status_ = {CMPI_RC_OK, nullptr};
+  DNSGeneralSettingDataObjectsTest() : SettingObjectsTest(kClass, makeDNSGeneralSettingDataInstance) {}
 };
 
 // --- which properties
@@ -92,7 +59,7 @@ TEST_F(DNSGeneralSettingDataObjectsTest, TheFilterIsSetIfMoreThanThePathIsReques
 TEST_F(DNSGeneralSettingDataObjectsTest, ValuesHaveTheTypesOfTheClass) {
   world_->file("eth0", "CONFIG_NAME=office\nDNSSUFFIXES=a.example.org b.example.org \n");
   const Instance instance = made();
-  EXPECT_EQ(chars("dnsgen1:myhost"), instance["InstanceID"]);
+  EXPECT_EQ(chars("dnsgen1:host1"), instance["InstanceID"]);
   EXPECT_EQ(chars("DNS General Configuration"), instance["Caption"]);
   EXPECT_EQ(chars("Represents DNS General Configuration for DNS Protocol EndPoint"), instance["Description"]);
   EXPECT_EQ(chars("DNSGeneralSettingData"), instance["ElementName"]);
@@ -115,9 +82,9 @@ TEST_F(DNSGeneralSettingDataObjectsTest, AnEmptyListOfSuffixesIsLeftOut) {
 }
 
 TEST_F(DNSGeneralSettingDataObjectsTest, ANodeWithoutANameReadsTheFileWithoutOneAndKeepsTheInstanceID) {
-  newWorld().host("myhost").nic("x", {.isUnnamed = true}).install().file("", "CONFIG_NAME=nameless\n");
+  newWorld().host("host1").nic("x", {.isUnnamed = true}).install().file("", "CONFIG_NAME=nameless\n");
   const Instance instance = made();
-  EXPECT_EQ(chars("dnsgen1:myhost"), instance["InstanceID"]);
+  EXPECT_EQ(chars("dnsgen1:host1"), instance["InstanceID"]);
   EXPECT_EQ(chars("nameless"), instance["ConfigurationName"]);
 }
 
@@ -143,8 +110,7 @@ TEST_F(DNSGeneralSettingDataObjectsTest, ASuffixWhoseStringFailsLeavesItsElement
   for (const Mode mode : {Mode::SetRc, Mode::RcAndNull, Mode::ReturnNull}) {
     broker_.failNext("newString", mode);
     EXPECT_EQ(list(CMPI_stringA, {null(CMPI_string), text("b"), text("c")}), made()["DNSSuffixesToAppend"]);
-    EXPECT_THAT(lines().errors(), IsEmpty());
-    EXPECT_TRUE(lines().exited("makeDNSGeneralSettingDataInstance"));
+    EXPECT_THAT(errors(), IsEmpty());
   }
 }
 
@@ -165,7 +131,7 @@ TEST_F(DNSGeneralSettingDataObjectsTest, ThePathHasTheKeyOfTheInstanceTheNamespa
   const CMPIObjectPath* ref = broker_.make(Path(kClass, "root/other").on("elsewhere"), "ref");
   EXPECT_EQ(0, getAllDNSGeneralSettingDataCMPIObjectPaths(broker_.cmpi(), ref, &paths, &status_));
   ASSERT_THAT(paths, SizeIs(1));
-  EXPECT_EQ(Path(kClass, "root/other").on("myhost").key("InstanceID", made()["InstanceID"]),
+  EXPECT_EQ(Path(kClass, "root/other").on("host1").key("InstanceID", made()["InstanceID"]),
             RecordingBroker::read(paths[0]));
 }
 
@@ -178,8 +144,7 @@ TEST_F(DNSGeneralSettingDataObjectsTest, TheKeyIsReadAndComparedWithNothing) {
     EXPECT_EQ(0, getOneDNSGeneralSettingDataCMPIInstance(broker_.cmpi(), ref, nullptr, &instances, &status_));
     EXPECT_EQ("ref.getKey(\"InstanceID\")", broker_.calls().lines().at(0));
     ASSERT_THAT(instances, SizeIs(1));
-    EXPECT_EQ(chars("dnsgen1:myhost"), RecordingBroker::read(instances[0])["InstanceID"]);
-    EXPECT_TRUE(lines().exited("getOneDNSGeneralSettingDataCMPIInstance"));
+    EXPECT_EQ(chars("dnsgen1:host1"), RecordingBroker::read(instances[0])["InstanceID"]);
   }
 }
 

@@ -1,65 +1,22 @@
 #include "factory/DNSSettingDataObjects.h"
 
-#include <gmock/gmock.h>
-
-#include <memory>
-#include <stdexcept>
-
-#include "ProviderCall.h"
-#include "World.h"
+#include "factory/testing/SettingObjectsTest.h"
 
 namespace ZV::Test {
 namespace {
 
 using std::string_literals::operator""s;
-using ::testing::Contains;
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-using ::testing::SizeIs;
 
 constexpr const char* kClass = "ZORVA_DNSSettingData";
-constexpr const char* kLogger = "Zorvagent.DNSObjFactory";
 
 const std::vector<std::string> kAllProperties = {"InstanceID",         "Caption",           "Description",
                                                  "ElementName",        "AddressOrigin",     "DomainName",
                                                  "RequestedHostname",  "ConfigurationName", "UseSuffixWhenRegistering",
                                                  "DNSServerAddresses", "DHCPOptionsToUse"};
 
-class DNSSettingDataObjectsTest : public ::testing::Test {
+class DNSSettingDataObjectsTest : public SettingObjectsTest<DNSSettingData> {
  protected:
-  DNSSettingDataObjectsTest() { world_->nic("eth0", usualNic()).install(); }
-
-  // An empty host instead of the one with a usual interface.
-  World& newWorld() {
-    world_.reset();
-    world_ = std::make_unique<World>();
-    return *world_;
-  }
-
-  CMPIInstance* make(PropertyList properties = nullptr, bool isObjPath = false) {
-    DNSSettingData data;
-    EXPECT_TRUE(static_cast<bool>(data));
-    logger_.clear();
-    return makeDNSSettingDataInstance(broker_.cmpi(), ref_, data, properties.cmpi(), isObjPath, &status_);
-  }
-  Instance made(PropertyList properties = nullptr, bool isObjPath = false) {
-    return RecordingBroker::read(make(std::move(properties), isObjPath));
-  }
-  // The number among all calls of the n-th call of a slot, as failAt counts.
-  std::size_t placeOf(std::string_view name, std::size_t n) const {
-    const Calls calls = broker_.calls();
-    for (std::size_t i = 0; i < calls.size(); ++i) {
-      if (calls[i].name == name && --n == 0) return i + 1;
-    }
-    throw std::out_of_range("no such call");
-  }
-  LogLines lines() const { return logger_.pairs().ofCategory(kLogger); }
-
-  std::unique_ptr<World> world_ = std::make_unique<World>();
-  RecordingLogger logger_;
-  RecordingBroker broker_;
-  CMPIObjectPath* ref_ = broker_.make(Path(kClass), "ref");
-  CMPIStatus status_ = {CMPI_RC_OK, nullptr};
+  DNSSettingDataObjectsTest() : SettingObjectsTest(kClass, makeDNSSettingDataInstance) {}
 };
 
 // --- which properties
@@ -185,8 +142,7 @@ TEST_F(DNSSettingDataObjectsTest, PathAndInstanceAreMadeWithoutTheStatus) {
 TEST_F(DNSSettingDataObjectsTest, AnArrayWithoutAHandleIsSkippedAndTheWorkGoesOn) {
   broker_.failNext("newArray", Mode::NullHandle);
   EXPECT_THAT(made().names(), Contains("DHCPOptionsToUse"));
-  EXPECT_THAT(lines().errors(), IsEmpty());
-  EXPECT_TRUE(lines().exited("makeDNSSettingDataInstance"));
+  EXPECT_THAT(errors(), IsEmpty());
 }
 
 TEST_F(DNSSettingDataObjectsTest, AServerWhoseStringFailsLeavesItsElementUnset) {
@@ -196,7 +152,7 @@ TEST_F(DNSSettingDataObjectsTest, AServerWhoseStringFailsLeavesItsElementUnset) 
     broker_.failNext("newString", mode);
     EXPECT_EQ(list(CMPI_stringA, {null(CMPI_string), text("b"), text("c")}), made()["DNSServerAddresses"]);
     EXPECT_EQ(3U, broker_.callsOf("newString"));
-    EXPECT_THAT(lines().errors(), IsEmpty());
+    EXPECT_THAT(errors(), IsEmpty());
   }
 }
 
@@ -205,7 +161,7 @@ TEST_F(DNSSettingDataObjectsTest, WhatTheInstanceRefusesStaysUnset) {
   EXPECT_THAT(made().names(), IsEmpty());
   EXPECT_EQ(kAllProperties.size(), broker_.callsOf("setProperty"));
   EXPECT_EQ(CMPI_RC_OK, status_.rc);
-  EXPECT_THAT(lines().errors(), IsEmpty());
+  EXPECT_THAT(errors(), IsEmpty());
 }
 
 // --- all, one, and paths
@@ -218,8 +174,7 @@ TEST_F(DNSSettingDataObjectsTest, OneInstanceIsFoundByExactText) {
     logger_.clear();
     EXPECT_EQ(1, getOneDNSSettingDataCMPIInstance(broker_.cmpi(), ref, nullptr, &instance, &status_)) << key;
     EXPECT_EQ(nullptr, instance);
-    EXPECT_TRUE(lines().exited("getOneDNSSettingDataCMPIInstance"));
-    EXPECT_THAT(lines().errors(), IsEmpty());
+    EXPECT_THAT(errors(), IsEmpty());
   }
 }
 

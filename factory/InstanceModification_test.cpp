@@ -1,16 +1,11 @@
 #include "factory/InstanceModification.h"
 
-#include <gmock/gmock.h>
-
+#include "Matchers.h"
 #include "ProviderCall.h"
 #include "World.h"
 
 namespace ZV::Test {
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-using ::testing::SizeIs;
 
 using Modify = unsigned int (*)(const CMPIBroker*, const CMPIObjectPath*, const char**, const CMPIInstance*,
                                 CMPIStatus*);

@@ -1,15 +1,11 @@
 #include "model/DNSClient.h"
 
-#include <RecordingLogger.h>
-#include <World.h>
-#include <gmock/gmock.h>
+#include "Matchers.h"
+#include "RecordingLogger.h"
+#include "World.h"
 
 namespace ZV::Test {
 namespace {
-
-using ::testing::Contains;
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 
 TEST(DNSClient, IsEmptyWhenItIsMade) {
   const DNSClient client;

@@ -1,16 +1,13 @@
 #include "model/DNSServer.h"
 
-#include <RecordingLogger.h>
-#include <World.h>
-#include <gmock/gmock.h>
-
 #include <vector>
+
+#include "Matchers.h"
+#include "RecordingLogger.h"
+#include "World.h"
 
 namespace ZV::Test {
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 
 DNSServer serverAt(const std::string& address) {
   DNSServer server;

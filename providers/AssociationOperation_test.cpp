@@ -1,16 +1,12 @@
 #include "providers/AssociationOperation.h"
 
-#include <gmock/gmock.h>
-
+#include "Matchers.h"
 #include "RecordingBroker.h"
 #include "RecordingLogger.h"
 #include "World.h"
 
 namespace ZV::Test {
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 
 std::vector<std::string> tokensOf(const std::string& text, const std::string& delimiters = "_") {
   std::vector<std::string> tokens;

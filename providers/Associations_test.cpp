@@ -7,10 +7,6 @@
 namespace ZV::Test {
 namespace {
 
-using ::testing::Contains;
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-
 std::string changed(std::string text, int (*change)(int)) {
   std::transform(text.begin(), text.end(), text.begin(),
                  [change](unsigned char letter) { return static_cast<char>(change(letter)); });

@@ -4,9 +4,6 @@
 namespace ZV::Test {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-
 struct Method {
   const char* name;
   const char* argumentName;

@@ -7,9 +7,6 @@ namespace ZV::Test {
 namespace {
 
 using std::string_literals::operator""s;
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-using ::testing::Optional;
 
 constexpr const char* kClass = "ZORVA_DNSProtocolEndPoint";
 constexpr const char* kFile = "HOSTNAME=filehost\nDOMAINNAME=file.example.org\n";

@@ -4,10 +4,6 @@
 namespace ZV::Test {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-using ::testing::SizeIs;
-
 class Endpoints : public InstanceTest {
  protected:
   Endpoints() : InstanceTest("DNSClientProvider") {}

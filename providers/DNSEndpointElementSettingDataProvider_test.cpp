@@ -3,9 +3,6 @@
 namespace ZV::Test {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-
 class EndpointElementSettingData : public AssociationTest {
  protected:
   EndpointElementSettingData() : AssociationTest("DNSEndPointElementSettingDataProvider") {}

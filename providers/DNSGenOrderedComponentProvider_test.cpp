@@ -5,9 +5,6 @@
 namespace ZV::Test {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-
 class GeneralOrderedComponent : public AssociationTest {
  protected:
   GeneralOrderedComponent() : AssociationTest("DNSGeneralOrderedComponentProvider") {

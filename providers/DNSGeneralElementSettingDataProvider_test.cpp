@@ -3,9 +3,6 @@
 namespace ZV::Test {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-
 class GeneralElementSettingData : public AssociationTest {
  protected:
   GeneralElementSettingData() : AssociationTest("DNSGeneralElementSettingDataProvider") { world.nic("eth0").install(); }

@@ -7,8 +7,6 @@ namespace ZV::Test {
 namespace {
 
 using std::string_literals::operator""s;
-using ::testing::ElementsAre;
-using ::testing::Optional;
 
 constexpr const char* kClass = "ZORVA_DNSGeneralSettingData";
 constexpr const char* kFile = "DOMAINNAME=d\nDNSSUFFIXES=old \nCONFIG_NAME=office\n";

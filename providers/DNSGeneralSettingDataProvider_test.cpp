@@ -4,9 +4,6 @@
 namespace ZV::Test {
 namespace {
 
-using ::testing::IsEmpty;
-using ::testing::SizeIs;
-
 class GeneralSettings : public InstanceTest {
  protected:
   GeneralSettings() : InstanceTest("DNSGeneralSettingDataProvider") { world.host("myhost"); }

@@ -3,9 +3,6 @@
 namespace ZV::Test {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-
 class OrderedComponent : public AssociationTest {
  protected:
   OrderedComponent() : AssociationTest("DNSOrderedComponentProvider") {}

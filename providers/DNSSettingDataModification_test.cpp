@@ -10,9 +10,6 @@ namespace ZV::Test {
 namespace {
 
 using std::string_literals::operator""s;
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-using ::testing::Optional;
 
 Path id(const std::string& instanceID) { return Path("ZORVA_DNSSettingData").key("InstanceID", instanceID.c_str()); }
 

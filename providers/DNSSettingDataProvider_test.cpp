@@ -10,10 +10,6 @@
 namespace ZV::Test {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-using ::testing::SizeIs;
-
 // Counts how often a file is opened.
 class OpenCounter {
  public:

@@ -1,15 +1,12 @@
 // What all twelve providers have alike: create functions, function tables, and the operations that do no work.
-#include <Providers.h>
-#include <World.h>
-#include <gmock/gmock.h>
-
 #include <set>
+
+#include "Matchers.h"
+#include "Providers.h"
+#include "World.h"
 
 namespace ZV::Test {
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 
 bool isModifiable(const Provider& provider) {
   return std::set<std::string>{"DNSClient", "DNSSettingData", "DNSGeneralSettingData"}.contains(provider.stem);

@@ -1,15 +1,11 @@
 #include "providers/Results.h"
 
-#include <gmock/gmock.h>
-
+#include "Matchers.h"
 #include "RecordingBroker.h"
 #include "World.h"
 
 namespace ZV::Test {
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 
 class ResultsOfAnOperation : public ::testing::Test {
  protected:

@@ -1,7 +1,6 @@
 #include "settings/DNSGeneralSettingData.h"
 
-#include <gmock/gmock.h>
-
+#include "Matchers.h"
 #include "RecordingLogger.h"
 #include "World.h"
 #include "settings/testing/FileAtEachLine.h"
@@ -10,8 +9,6 @@ namespace ZV::Test {
 namespace {
 
 using std::string_literals::operator""s;
-using ::testing::ElementsAre;
-using ::testing::Optional;
 
 constexpr const char* kBothKeys = "CONFIG_NAME=office\nDNSSUFFIXES=lab.example.org file.example.org \n";
 

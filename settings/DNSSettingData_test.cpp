@@ -1,7 +1,6 @@
 #include "settings/DNSSettingData.h"
 
-#include <gmock/gmock.h>
-
+#include "Matchers.h"
 #include "RecordingLogger.h"
 #include "World.h"
 #include "settings/testing/FileAtEachLine.h"
@@ -9,9 +8,6 @@
 namespace ZV::Test {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-using ::testing::Optional;
 using std::string_literals::operator""s;
 
 constexpr const char* kAllKeys =

@@ -1,7 +1,6 @@
 #include "settings/InterfaceFile.h"
 
 #include <fcntl.h>
-#include <gmock/gmock.h>
 #include <sched.h>
 #include <sys/fsuid.h>
 #include <sys/mount.h>
@@ -18,15 +17,13 @@
 #include <thread>
 
 #include "CimValues.h"
+#include "Matchers.h"
 #include "RecordingLogger.h"
 #include "World.h"
 
 namespace ZV::Test {
 namespace {
 
-using ::testing::AnyOf;
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 using std::string_literals::operator""s;
 
 constexpr std::size_t kPiece = 511;  // the longest piece that is read at once

@@ -1,18 +1,16 @@
 #include "trace/Trace.h"
 
-#include <RecordingLogger.h>
 #include <cmpift.h>
-#include <gmock/gmock.h>
 
 #include <map>
 #include <thread>
 #include <vector>
 
+#include "Matchers.h"
+#include "RecordingLogger.h"
+
 namespace ZV::Test {
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::StartsWith;
 
 const std::string kLogger = "Zorvagent.Sample";
 const LogSite kSite = {"walk", "model/Sample.cpp", 42};

@@ -1,18 +1,14 @@
 #include "cmpi/support/CmpiSupport.h"
 
-#include <gmock/gmock.h>
-
 #include <vector>
 
+#include "Matchers.h"
 #include "RecordingBroker.h"
 
 namespace ZV::Test {
 namespace {
 
-using namespace zorva::cmpi;
-using ::testing::IsEmpty;
-
-// A factory function may return null, or an object without a handle: then it is not used.
+// What a function of the factories gave is perhaps nothing, or an object without a handle: it is not used then.
 class CmpiSupport : public ::testing::Test {
  protected:
   CMPIObjectPath* path(const char* className) { return broker_.make(Path(className)); }

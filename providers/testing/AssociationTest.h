@@ -2,11 +2,10 @@
 // end are told in tests/conformance/.
 #pragma once
 
-#include <gmock/gmock.h>
-
 #include <string>
 #include <vector>
 
+#include "Matchers.h"
 #include "Providers.h"
 #include "RecordingBroker.h"
 #include "RecordingLogger.h"

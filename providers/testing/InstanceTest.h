@@ -1,11 +1,10 @@
 // One of the four instance providers on a world that a test fills and installs.
 #pragma once
 
-#include <gmock/gmock.h>
-
 #include <string>
 #include <vector>
 
+#include "Matchers.h"
 #include "Providers.h"
 #include "RecordingBroker.h"
 #include "RecordingLogger.h"

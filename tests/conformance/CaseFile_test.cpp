@@ -1,16 +1,12 @@
 #include "CaseFile.h"
 
-#include <gmock/gmock.h>
-
 #include <functional>
+
+#include "Matchers.h"
 
 namespace ZV::Test {
 
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
-using ::testing::StartsWith;
 
 const std::string kCase =
     "provider: P\ncase: It works\nrequest: Cleanup\nhappens: nothing\nends: CMPI_RC_OK, left open\n";

@@ -1,14 +1,10 @@
 #include "CaseRun.h"
 
-#include <gmock/gmock.h>
+#include "Matchers.h"
 
 namespace ZV::Test {
 
 namespace {
-
-using ::testing::AllOf;
-using ::testing::HasSubstr;
-using ::testing::StartsWith;
 
 const std::string kMarks =
     "phrase: enters\n"

@@ -29,15 +29,8 @@ const char* nameOf(FileCall call) {
 }
 
 const char* nameOf(FileFault fault) {
-  switch (fault) {
-    case FileFault::Refused:
-      return "refused";
-    case FileFault::HalfDone:
-      return "half done";
-    case FileFault::Interrupted:
-      return "interrupted";
-  }
-  return "unknown";
+  static constexpr const char* kNames[] = {"refused", "half done", "interrupted"};
+  return kNames[static_cast<std::size_t>(fault)];
 }
 
 FailingFiles::FailingFiles(std::size_t n, FileFault fault) : n_(n), fault_(fault) { active = this; }

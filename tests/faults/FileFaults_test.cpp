@@ -5,12 +5,11 @@
 
 #include "FaultTest.h"
 #include "FileCalls.h"
+#include "Matchers.h"
 #include "agent/Agent.h"
 
 namespace ZV::Test {
 namespace {
-
-using ::testing::AnyOf;
 
 class FileFaults : public FaultTest {
  protected:

@@ -42,15 +42,8 @@ void write(const std::string& path, const std::string& content) {
 }  // namespace
 
 const char* nameOf(Tree tree) {
-  switch (tree) {
-    case Tree::Empty:
-      return "Empty";
-    case Tree::OneInterface:
-      return "OneInterface";
-    case Tree::ThreeInterfaces:
-      return "ThreeInterfaces";
-  }
-  return "unknown";
+  static constexpr const char* kNames[] = {"Empty", "OneInterface", "ThreeInterfaces"};
+  return kNames[static_cast<std::size_t>(tree)];
 }
 
 Host::Host(Tree tree) {

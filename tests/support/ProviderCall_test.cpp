@@ -1,18 +1,14 @@
 #include "ProviderCall.h"
 
 #include <cmpimacs.h>
-#include <gmock/gmock.h>
 
+#include "Matchers.h"
 #include "agent/interface/ZALogger.h"
 
 namespace ZV::Test {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
-using ::testing::IsEmpty;
-
-// A provider of one class that answers each operation in a different, recognizable way.
+// A provider of one class that answers each operation in its own recognisable way.
 namespace sample {
 
 const CMPIBroker* broker = nullptr;

@@ -186,19 +186,8 @@ CMPIBrokerMemFT* memoryTable() {
 }  // namespace
 
 const char* nameOf(Mode mode) {
-  switch (mode) {
-    case Mode::SetRc:
-      return "rc set";
-    case Mode::ReturnNull:
-      return "null";
-    case Mode::NullHandle:
-      return "null handle";
-    case Mode::RcAndNull:
-      return "rc set and null";
-    case Mode::Throw:
-      return "exception";
-  }
-  return "unknown";
+  static constexpr const char* kNames[] = {"rc set", "null", "null handle", "rc set and null", "exception"};
+  return kNames[static_cast<std::size_t>(mode)];
 }
 
 std::vector<std::string> Calls::lines() const { return without({}); }

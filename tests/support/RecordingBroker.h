@@ -108,8 +108,6 @@ class RecordingBroker {
  public:
   RecordingBroker();
   ~RecordingBroker();
-  RecordingBroker(const RecordingBroker&) = delete;
-  RecordingBroker& operator=(const RecordingBroker&) = delete;
 
   const CMPIBroker* cmpi() const { return &broker_; }
 

@@ -1,17 +1,14 @@
 #include "RecordingBroker.h"
 
 #include <cmpimacs.h>
-#include <gmock/gmock.h>
 
 #include <thread>
 
 #include "BrokerObjects.h"
+#include "Matchers.h"
 
 namespace ZV::Test {
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 
 CMPIObjectPath* makeEndpointPath(const CMPIBroker* cmpi) {
   CMPIObjectPath* path = CMNewObjectPath(cmpi, "root/cimv2", "ZORVA_DNSProtocolEndPoint", nullptr);

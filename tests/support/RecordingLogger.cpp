@@ -51,23 +51,8 @@ std::string messageText(const std::string& text) {
 bool isHexDigit(char c) { return (c >= '0' && c <= '9') || (c >= 'a' && c <= 'f'); }
 
 const char* nameOf(LineKind kind) {
-  switch (kind) {
-    case LineKind::Banner:
-      return "banner";
-    case LineKind::Entering:
-      return "ENTERING";
-    case LineKind::Exiting:
-      return "EXITING";
-    case LineKind::Method:
-      return "METHOD";
-    case LineKind::Message:
-      return "MESSAGE";
-    case LineKind::Variable:
-      return "VARIABLE";
-    case LineKind::Other:
-      return "OTHER";
-  }
-  return "OTHER";
+  static constexpr const char* kNames[] = {"banner", "ENTERING", "EXITING", "METHOD", "MESSAGE", "VARIABLE", "OTHER"};
+  return kNames[static_cast<std::size_t>(kind)];
 }
 
 std::string describe(const LogLine& line) {

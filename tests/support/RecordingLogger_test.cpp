@@ -1,14 +1,10 @@
 #include "RecordingLogger.h"
 
-#include <gmock/gmock.h>
-
+#include "Matchers.h"
 #include "agent/interface/ZALogger.h"
 
 namespace ZV::Test {
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 
 void logOnly(int level, const std::string& text) {
   ZALog::ZALogger::logLevelMessage("f", "model/File.cpp", 7, "Zorvagent.X", level, nullptr, 0, 0, text);

@@ -1,9 +1,8 @@
 #include "World.h"
 
-#include <gmock/gmock.h>
-
 #include <filesystem>
 
+#include "Matchers.h"
 #include "RecordingLogger.h"
 #include "agent/interface/Instrumentation.h"
 #include "agent/interface/PlatformUtilities.h"
@@ -11,10 +10,6 @@
 
 namespace ZV::Test {
 namespace {
-
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
-using ::testing::Optional;
 
 std::string textAt(const Instrumentation& cursor, NodeLexicon::Properties property) {
   std::string value = "absent";
