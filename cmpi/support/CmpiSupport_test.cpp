@@ -8,7 +8,9 @@
 namespace ZV::Test {
 namespace {
 
-// What a function of the factories gave is perhaps nothing, or an object without a handle: it is not used then.
+using namespace zorva::cmpi;
+
+// A factory function may return null, or an object without a handle: then it is not used.
 class CmpiSupport : public ::testing::Test {
  protected:
   CMPIObjectPath* path(const char* className) { return broker_.make(Path(className)); }
