@@ -71,7 +71,9 @@ TEST(Readme, ShowsWhatShowSays) {
   EXPECT_THAT(blockAfter("## What you see"), HasSubstr("$ ./run\n" + untilClasses));
 }
 
-TEST(Readme, ItsCommandsThatReadWork) { runAll(shownHost(), blockAfter("Arguments after `--` are passed to `zorvactl`")); }
+TEST(Readme, ItsCommandsThatReadWork) {
+  runAll(shownHost(), blockAfter("Arguments after `--` are passed to `zorvactl`"));
+}
 
 TEST(Readme, ItsCommandsThatChangeWorkInTheirOrder) {
   const TestHost host = shownHost();
