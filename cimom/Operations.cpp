@@ -218,7 +218,7 @@ Status invokeMethod(Operation& operation) {
   if (!result.returnValue.isNull) cimxml::appendReturnValue(out, result.returnValue);
   for (const broker::NamedValue& value : result.output) {
     cimxml::appendParameter(out, value);
-    operation.writer.settle();
+    operation.writer.drainIfFull();
   }
   return {};
 }

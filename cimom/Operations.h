@@ -70,7 +70,7 @@ class Stream {
   bool put(Append&& append) {
     try {
       append(writer_.out());
-      writer_.settle();
+      writer_.drainIfFull();
       return true;
     } catch (...) {
       problem_ = std::current_exception();

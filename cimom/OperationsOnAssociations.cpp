@@ -94,7 +94,7 @@ Status answerOfClass(Operation& operation, const Question& question) {
     cimxml::appendClassPath(out, operation.host.name(), operation.nameSpace, one->name());
     if (!question.namesOnly) cimxml::appendClass(out, *one, detail, operation.classes());
     out += question.namesOnly ? "</OBJECTPATH>" : "</VALUE.OBJECTWITHPATH>";
-    operation.writer.settle();
+    operation.writer.drainIfFull();
   }
   operation.writer.endReturnValue();
   return {};

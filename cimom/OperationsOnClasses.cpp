@@ -60,7 +60,7 @@ Status enumerateClasses(Operation& operation) {
   operation.writer.beginReturnValue();
   for (const Class* one : found) {
     cimxml::appendClass(operation.writer.out(), *one, detail, operation.classes());
-    operation.writer.settle();
+    operation.writer.drainIfFull();
   }
   operation.writer.endReturnValue();
   return {};
@@ -97,7 +97,7 @@ Status enumerateQualifiers(Operation& operation) {
   operation.writer.beginReturnValue();
   for (const schema::QualifierType* type : operation.classes().qualifierTypes()) {
     cimxml::appendQualifierType(operation.writer.out(), *type);
-    operation.writer.settle();
+    operation.writer.drainIfFull();
   }
   operation.writer.endReturnValue();
   return {};

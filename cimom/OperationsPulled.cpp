@@ -58,7 +58,7 @@ void write(Operation& operation, const PullObjects& objects, bool ended, const s
   writer.beginReturnValue();
   for (const std::string& text : objects.texts()) {
     writer.out() += text;
-    writer.settle();
+    writer.drainIfFull();
   }
   writer.endReturnValue();
   cimxml::appendParameter(writer.out(), {"EndOfSequence", broker::Value::boolean(ended)});

@@ -10,13 +10,13 @@ namespace zorva::cimxml {
 
 namespace {
 
-/// The attributes that a property or a method has for the class in which it stands.
+/// The attributes that a property or a method has for the class that contains it.
 void appendOrigin(std::string& out, const schema::Class* origin, const schema::Class& at, const ClassDetail& detail) {
   if (detail.classOrigin && origin != nullptr) appendAttribute(out, "CLASSORIGIN", origin->name());
   appendFlag(out, "PROPAGATED", origin != &at, false);
 }
 
-/// An EmbeddedObject or EmbeddedInstance qualifier shows in the element too (DSP0201 5.3.1).
+/// An EmbeddedObject or EmbeddedInstance qualifier is also an attribute of the element (DSP0201 5.3.1).
 void appendEmbedded(std::string& out, const schema::Qualifiers& qualifiers) {
   if (schema::findQualifier(qualifiers, "EmbeddedInstance") != nullptr) {
     appendAttribute(out, "EmbeddedObject", "instance");
@@ -38,7 +38,8 @@ void appendProperty(std::string& out, const schema::ClassProperty& property, con
   }
   if (property.arraySize) appendAttribute(out, "ARRAYSIZE", std::to_string(*property.arraySize));
   appendOrigin(out, property.origin, at, detail);
-  // Some clients refuse the attribute on an array, where DTDs before 2.3 did not have it. The qualifier says the same.
+  // Some clients refuse the attribute on an array, because DTDs before 2.3 did not have it. The qualifier says the
+  // same.
   if (!isReference && !property.isArray) appendEmbedded(out, property.qualifiers);
   out += '>';
   if (detail.qualifiers) appendQualifiers(out, property.qualifiers, property.origin != &at, classes);

@@ -1,5 +1,8 @@
 #pragma once
 
+// Classes as elements of CIM-XML (DSP0201 2.4, DTD DSP0203 2.4.0). As ElementWriter.h: each function
+// appends one element, keeps no state, and may be called on any thread.
+
 #include <optional>
 #include <string>
 #include <string_view>
@@ -7,17 +10,14 @@
 
 #include "schema/ClassRepository.h"
 
-// Classes as elements of CIM-XML (DSP0201 2.4, DTD DSP0203 2.4.0). As ElementWriter.h: each function
-// appends one element, keeps no state, and may be called on any thread.
-
 namespace zorva::cimxml {
 
-/// What of a class is written (DSP0200 5.3.2.1).
+/// Which parts of a class are written (DSP0200 5.3.2.1).
 struct ClassDetail {
   bool localOnly = true;
   bool qualifiers = true;
   bool classOrigin = false;
-  /// Absent: all properties. Methods are not concerned.
+  /// Absent: all properties. Methods are not affected.
   std::optional<std::vector<std::string>> propertyList;
 };
 

@@ -53,7 +53,7 @@ TEST_F(ClassWriterTest, WritesWhatTheClassItselfDeclares) {
             R"(<VALUE>7</VALUE></PROPERTY></CLASS>)");
 }
 
-TEST_F(ClassWriterTest, MarksWhatIsInheritedAndWhereItIsFrom) {
+TEST_F(ClassWriterTest, MarksWhatIsInheritedAndItsOrigin) {
   const std::string text = written("T_Derived", {false, false, true, std::vector<std::string>{"name", "KIND"}});
   EXPECT_THAT(text,
               HasSubstr(R"(<PROPERTY NAME="Name" TYPE="string" CLASSORIGIN="T_Base" PROPAGATED="true"></PROPERTY>)"));

@@ -13,7 +13,7 @@ namespace {
 
 using pugi::xml_node;
 
-// How deep embedded instances may lie within one another, each a text of its own within the other's.
+// How deep embedded instances may be nested, each as a text within the other's.
 constexpr int kDeepestEmbedded = 8;
 
 constexpr std::size_t kNoLimit = std::numeric_limits<std::size_t>::max();
@@ -24,7 +24,7 @@ const ReaderLimits& noLimits() {
   return limits;
 }
 
-/// A number in one of the bases that DSP0201 5.3.1 knows beside ten; else the text itself, for the broker to convert.
+/// A number in one of the other bases of DSP0201 5.3.1; else the text itself, for the broker to convert.
 broker::Scalar numberOrText(std::string_view text) {
   std::uint64_t number = 0;
   if (text.size() > 2 && text[0] == '0' && (text[1] == 'x' || text[1] == 'X')) {
@@ -132,7 +132,7 @@ schema::Type ElementReader::typeOf(xml_node node, const char* attribute) const {
 
 ValueKind ElementReader::kindOf(xml_node node, const char* typeAttribute) const {
   ValueKind kind{typeOf(node, typeAttribute), false};
-  // The attribute is known in two spellings (DSP0201 5.2.5.7).
+  // The attribute has two spellings (DSP0201 5.2.5.7).
   const std::string_view type = node.attribute(typeAttribute).value();
   kind.isEmbedded =
       node.attribute("EmbeddedObject") || node.attribute("EMBEDDEDOBJECT") || type == "object" || type == "instance";

@@ -1,12 +1,5 @@
 #pragma once
 
-#include <string>
-#include <string_view>
-
-#include "broker/objects/Value.h"
-#include "cimxml/XmlTree.h"
-#include "schema/ClassRepository.h"
-
 // Names, values and instances (DSP0201 2.4), which requests and responses both have, as plain values. For the readers
 // of this folder alone; the functions throw Refusal.
 //
@@ -14,9 +7,16 @@
 // of the text where only the schema can tell their type; the broker converts them. Of a response, what is missing is
 // left empty; its values get the types that its elements say, and its keys those that the classes declare.
 
+#include <string>
+#include <string_view>
+
+#include "broker/objects/Value.h"
+#include "cimxml/XmlTree.h"
+#include "schema/ClassRepository.h"
+
 namespace zorva::cimxml {
 
-/// What the elements around a value say about it.
+/// The attributes of the elements around a value.
 struct ValueKind {
   schema::Type type = schema::Type::String;
   bool isEmbedded = false;
@@ -34,7 +34,7 @@ class ElementReader {
   /// The value of an attribute; of a response, empty where it is not there.
   std::string_view attribute(pugi::xml_node node, const char* name) const;
 
-  /// The text of an element, put together from its pieces.
+  /// The text of an element, joined from its pieces.
   std::string content(pugi::xml_node node) const;
 
   /// LOCALNAMESPACEPATH.
@@ -79,7 +79,7 @@ class ElementReader {
   broker::Scalar embedded(pugi::xml_node place, const std::string& text, int nesting);
 
   Reading reading_;
-  const schema::ClassRepository* const classes_;  // null: of a request
+  const schema::ClassRepository* const classes_;  ///< null: of a request
 };
 
 }  // namespace zorva::cimxml

@@ -1,35 +1,35 @@
 #pragma once
 
+// CIM values, names and instances as elements of CIM-XML (DSP0201 2.4, DTD DSP0203 2.4.0).
+//
+// Each function appends to `out` one element, without blanks or line feeds around it. Output is well-formed UTF-8 for
+// any input: characters that XML 1.0 cannot hold, and bytes that are no UTF-8, become U+FFFD. The functions keep no
+// state and throw only std::bad_alloc; each may be called on any thread.
+
 #include <string>
 #include <string_view>
 
 #include "broker/objects/Value.h"
-
-// CIM values, names and instances as elements of CIM-XML (DSP0201 2.4, DTD DSP0203 2.4.0).
-//
-// Each function appends to `out` one element, without blanks or line feeds around it. Output is well-formed UTF-8 for
-// any input: characters that XML 1.0 cannot hold, and bytes that are no UTF-8, come out as U+FFFD. The functions keep
-// no state and throw only for want of memory; each may be called on any thread.
 
 namespace zorva::cimxml {
 
 /// VALUE, VALUE.ARRAY, VALUE.REFERENCE or VALUE.REFARRAY. Nothing at all for null.
 void appendValue(std::string& out, const broker::Value& value);
 
-/// INSTANCENAME with its KEYBINDINGs, whatever host and namespace the path has.
+/// INSTANCENAME with its KEYBINDINGs; host and namespace of the path are ignored.
 void appendInstanceName(std::string& out, const broker::ObjectPath& path);
 
 /// LOCALNAMESPACEPATH: a NAMESPACE for each part between slashes.
 void appendLocalNamespacePath(std::string& out, std::string_view nameSpace);
 
-/// INSTANCEPATH where the path has host and namespace, LOCALINSTANCEPATH where it has a namespace alone, INSTANCENAME
-/// where it has none.
+/// INSTANCEPATH if the path has host and namespace, LOCALINSTANCEPATH if it has only a namespace, INSTANCENAME if it
+/// has none.
 void appendInstancePath(std::string& out, const broker::ObjectPath& path);
 
 /// NAMESPACEPATH: HOST and LOCALNAMESPACEPATH.
 void appendNamespacePath(std::string& out, std::string_view host, std::string_view nameSpace);
 
-/// INSTANCEPATH, whatever the path has: `host` stands for a host that it lacks.
+/// Always INSTANCEPATH: `host` is used if the path has no host.
 void appendWholePath(std::string& out, const broker::ObjectPath& path, std::string_view host);
 
 /// PARAMVALUE of a method's output.
@@ -38,10 +38,11 @@ void appendParameter(std::string& out, const broker::NamedValue& parameter);
 /// RETURNVALUE of a method. `value` is not null.
 void appendReturnValue(std::string& out, const broker::Value& value);
 
-/// What is written of an instance beside its properties' names, types and values.
+/// The parts of an instance that are written besides its properties' names, types and values.
 struct InstanceDetail {
   bool classOrigin = false;  ///< CLASSORIGIN of each property whose declaration is known
-  /// Not null: the qualifiers of class and properties, where the declaration is known; it tells the qualifiers' types.
+  /// Not null: the qualifiers of class and properties are written, if the declaration is known. It has the qualifiers'
+  /// types.
   const schema::ClassRepository* qualifiers = nullptr;
 };
 

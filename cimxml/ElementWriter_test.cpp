@@ -35,7 +35,7 @@ std::string instanceElement(const Property& property, bool classOrigin = false) 
   return out;
 }
 
-TEST(XmlValue, IsNothingWhereItIsNull) { EXPECT_EQ(elementOf(Value::null(schema::Type::String)), ""); }
+TEST(XmlValue, IsNothingIfItIsNull) { EXPECT_EQ(elementOf(Value::null(schema::Type::String)), ""); }
 
 TEST(XmlValue, HasOneElementForEachElementOfAnArray) {
   EXPECT_EQ(elementOf(Value::array(schema::Type::Uint16, {Scalar(std::uint64_t{8}), Scalar()})),

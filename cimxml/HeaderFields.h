@@ -1,11 +1,11 @@
 #pragma once
 
+// The values of the header fields that CIM has over HTTP (DSP0200 1.4): UTF-8 in percent-encoding (7.3). These
+// functions keep no state; each may be called on any thread.
+
 #include <optional>
 #include <string>
 #include <string_view>
-
-// The values of the header fields that CIM has over HTTP (DSP0200 1.4): UTF-8 in percent-encoding (7.3). These
-// functions keep no state; each may be called on any thread.
 
 namespace zorva::cimxml {
 

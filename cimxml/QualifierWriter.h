@@ -1,23 +1,23 @@
 #pragma once
 
+// Qualifiers, and the values that a schema has, as elements of CIM-XML (DSP0201 2.4, DTD DSP0203 2.4.0). As XmlText.h:
+// each function appends, keeps no state, and may be called on any thread.
+
 #include <string>
 #include <string_view>
 
 #include "schema/ClassRepository.h"
-
-// Qualifiers, and the values that a schema has, as elements of CIM-XML (DSP0201 2.4, DTD DSP0203 2.4.0). As XmlText.h:
-// each function appends, keeps no state, and may be called on any thread.
 
 namespace zorva::cimxml {
 
 /// An attribute that is "true" or "false"; none where the value is the one that the DTD has `unlessSaid`.
 void appendFlag(std::string& out, std::string_view name, bool value, bool unlessSaid);
 
-/// VALUE or VALUE.ARRAY; nothing for null. Of a reference's default value, nothing: the DTD has no place for a path
+/// VALUE or VALUE.ARRAY; nothing for null. Nothing for a reference's default value: the DTD has no place for a path
 /// that is a text.
 void appendSchemaValue(std::string& out, const schema::Value& value, schema::Type type);
 
-/// A QUALIFIER for each. `inherited`: all are marked as propagated, whatever they say themselves.
+/// A QUALIFIER for each. `inherited`: all are marked as propagated, independent of their own marks.
 void appendQualifiers(std::string& out, const schema::Qualifiers& qualifiers, bool inherited,
                       const schema::ClassRepository& classes);
 

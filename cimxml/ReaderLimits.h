@@ -6,8 +6,8 @@
 
 namespace zorva::cimxml {
 
-/// The most that a request may have of each. No request for real classes comes near them; they keep what a request
-/// costs later, in whoever takes its parts one by one, in proportion to its size.
+/// The limits of a request. Requests for real classes are far below them. They keep the later cost of a request in
+/// proportion to its size, also in code that takes its parts one by one.
 struct ReaderLimits {
   XmlLimits xml;
   std::size_t calls = 100;        ///< SIMPLEREQs in one MULTIREQ

@@ -1,5 +1,12 @@
 #pragma once
 
+// CIM-XML requests (DSP0201 2.4, operations of DSP0200 1.4) as plain values.
+//
+// The reader accepts any bytes. It is as lenient as DSP0200 requires: elements and attributes that the DTD does not
+// have are skipped. If only the schema can decide the type of a value, `broker::Value` has it as a text, and the broker
+// converts it to the declared type. Time and memory grow with the text only, within the limits. The function keeps no
+// state and may be called on any thread.
+
 #include <optional>
 #include <string>
 #include <string_view>
@@ -10,18 +17,11 @@
 #include "cimxml/ReaderLimits.h"
 #include "util/Expected.h"
 
-// CIM-XML requests (DSP0201 2.4, operations of DSP0200 1.4) as plain values.
-//
-// The reader takes any bytes. It is as lenient as DSP0200 wants a server to be: elements and attributes that the DTD
-// does not know are passed over. Values keep the form of the text that they came in where only the schema can tell
-// their type: `broker::Value` holds a text, and the broker turns it into what is declared. Time and memory grow with
-// the text alone, within the limits. The function keeps no state and may be called on any thread.
-
 namespace zorva::cimxml {
 
 struct RequestError {
   Fault fault = Fault::NotWellFormed;
-  std::string message;  ///< what is wrong, and where: "line 3, column 9: …"
+  std::string message;  ///< the error and its place: "line 3, column 9: …"
 };
 
 /// The name of a class as the value of a parameter.
@@ -29,7 +29,8 @@ struct ClassName {
   std::string name;
 };
 
-/// A class or a qualifier type as the value of a parameter. It is not read: no operation that takes one is offered.
+/// A class or a qualifier type as the value of a parameter. It is not read: the server offers no operation that takes
+/// one.
 struct Declaration {};
 
 /// An array of texts; a null element has no text.
@@ -49,14 +50,14 @@ struct Parameter {
 struct Call {
   bool isExtrinsic = false;
   std::string name;
-  /// The namespace; of a METHODCALL also the class and, unless `onClass`, the keys of what the method is called on. A
-  /// key with an empty name is the only key that there is (INSTANCENAME with a bare KEYVALUE).
+  /// The namespace; for a METHODCALL also the class and, unless `onClass`, the keys of the object. A key with an empty
+  /// name is the only key (INSTANCENAME with a bare KEYVALUE).
   broker::ObjectPath target;
   bool onClass = false;
-  // A name may be there twice: the operation refuses it, with a status of its own.
+  /// A name may occur twice: the operation refuses it, with its own status.
   std::vector<Parameter> parameters;      ///< of an IMETHODCALL
   std::vector<broker::NamedValue> input;  ///< of a METHODCALL
-  /// The types that the client gave the elements of `input`; without one, the class alone says the type.
+  /// The types that the client gave the elements of `input`; without one, the class alone decides the type.
   std::vector<std::optional<schema::Type>> saidTypes;
 };
 

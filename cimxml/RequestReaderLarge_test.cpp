@@ -1,5 +1,6 @@
-// Requests in which one element repeats as often as a body has room for: reading them takes time in proportion to their
-// size, and ends when it is told to.
+// Requests in which one element repeats as often as a body has room for. Reading takes time in proportion to their
+// size, and ends when its time is over.
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
@@ -86,7 +87,7 @@ std::string always(std::size_t count, const std::string& piece) {
 struct Kind {
   const char* name;
   std::function<std::string(std::size_t count)> body;
-  const char* cap;  ///< what the error says where there are 20,000; null: they are read, or end for another reason
+  const char* cap;  ///< the error with 20,000 of them; null: they are read, or end for another reason
 };
 
 std::vector<Kind> kinds() {
@@ -155,7 +156,7 @@ std::vector<Kind> kinds() {
              "</VALUE></PARAMVALUE>");
        },
        "INSTANCE has more than 32 attributes"},
-      {"element nobody knows", [](std::size_t n) { return intrinsic(always(n, "<EXTRA A=\"b\"/>")); }, nullptr},
+      {"unknown element", [](std::size_t n) { return intrinsic(always(n, "<EXTRA A=\"b\"/>")); }, nullptr},
       {"long name", [](std::size_t n) { return intrinsic("<IPARAMVALUE NAME=\"" + std::string(n, 'x') + "\"/>"); },
        "the attribute NAME with more than 1024 bytes"},
       {"comment", [](std::size_t n) { return value("<VALUE>" + always(n, "a<!-- -->") + "</VALUE>"); }, nullptr},
@@ -191,7 +192,7 @@ TEST(LargeRequests, TheCapsLeaveRoomForWhatTheyName) {
               HasSubstr("VALUE.ARRAY has more than 65536 values"));
 }
 
-/// The caps do not count: the reading itself is to be measured.
+/// Without the limits, because the reading itself is measured.
 ReaderLimits wide() {
   ReaderLimits limits;
   constexpr std::size_t kMany = 100'000'000;

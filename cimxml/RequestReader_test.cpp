@@ -197,7 +197,7 @@ TEST(RequestReader, PassesOverWhatTheDtdDoesNotKnow) {
   EXPECT_EQ(call.name, "N");
 }
 
-TEST(RequestReader, TellsWhereSomethingIsMissing) {
+TEST(RequestReader, ReportsWhereSomethingIsMissing) {
   const RequestError error = errorOf("<CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.0\">\n  <MESSAGE ID=\"1\"/></CIM>");
   EXPECT_EQ(error.fault, Fault::NotLooselyValid);
   EXPECT_EQ(error.message, "line 2, column 4: MESSAGE lacks the attribute PROTOCOLVERSION");
@@ -221,7 +221,7 @@ TEST(RequestReader, RefusesWhatIsNotLooselyValid) {
        "is no char16"},
       {message(parameter("<INSTANCE CLASSNAME='C'><PROPERTY NAME='A' TYPE='string'/><PROPERTY NAME='a' TYPE='string'/>"
                          "</INSTANCE>")),
-       "stands twice"},
+       "is given twice"},
       {message(extrinsic("<PARAMVALUE NAME='a'><CLASS NAME='c'/></PARAMVALUE>")), "no value that a method takes"},
       {message(parameter("<VALUE.NAMEDINSTANCE><INSTANCENAME CLASSNAME='A'/><INSTANCE CLASSNAME='B'/>"
                          "</VALUE.NAMEDINSTANCE>")),

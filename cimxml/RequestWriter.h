@@ -1,5 +1,7 @@
 #pragma once
 
+// CIM-XML requests (DSP0201, operations of DSP0200) to a server.
+
 #include <optional>
 #include <string>
 #include <string_view>
@@ -7,11 +9,9 @@
 
 #include "broker/Broker.h"
 
-// CIM-XML requests (DSP0201, operations of DSP0200) as they go to a server.
-
 namespace zorva::cimxml {
 
-/// The text of an intrinsic operation, built parameter by parameter. Names that are given empty are left out.
+/// The text of an intrinsic operation, built parameter by parameter. Empty names are left out.
 class IntrinsicCall {
  public:
   IntrinsicCall(std::string_view operation, std::string_view nameSpace);
@@ -23,7 +23,7 @@ class IntrinsicCall {
   IntrinsicCall& propertyList(const std::optional<std::vector<std::string>>& names);
   IntrinsicCall& modifiedInstance(const broker::Instance& instance);
 
-  /// The whole message. The call is used up.
+  /// The whole message. The call must not be used afterwards.
   std::string message();
 
  private:

@@ -10,7 +10,7 @@ namespace {
 
 using pugi::xml_node;
 
-/// Whatever a server sends, reading it must not exhaust the stack.
+/// A limit for any server, so that reading does not use up the stack.
 constexpr std::size_t kDeepest = 128;
 constexpr std::size_t kMostElements = 20'000'000;
 
@@ -56,7 +56,7 @@ class Reader {
     }
   }
 
-  /// VALUE.NAMEDINSTANCE, VALUE.INSTANCEWITHPATH, VALUE.OBJECTWITHPATH and their like: a name, and what it names.
+  /// VALUE.NAMEDINSTANCE, VALUE.INSTANCEWITHPATH, VALUE.OBJECTWITHPATH and the like: a name and its object.
   void readNamedInstance(const xml_node& node) {
     const xml_node element = node.child("INSTANCE");
     if (!element) return;
@@ -77,7 +77,7 @@ class Reader {
     }
   }
 
-  /// A class as far as a client needs it: names, types, keys, references, methods.
+  /// The parts of a class that a client needs: names, types, keys, references, methods.
   schema::ClassDeclaration classOf(const xml_node& node) {
     schema::ClassDeclaration declared;
     declared.name = textAttribute(node, "NAME");
@@ -118,7 +118,7 @@ class Reader {
     return method;
   }
 
-  /// Those that a client looks at.
+  /// The qualifiers that a client needs.
   schema::Qualifiers qualifiersOf(const xml_node& node) {
     schema::Qualifiers qualifiers;
     for (const xml_node& each : node.children("QUALIFIER")) {

@@ -1,5 +1,10 @@
 #pragma once
 
+// CIM-XML responses (DSP0201 2.x) as plain values.
+//
+// A server is not trusted: the text is read within bounds of depth, elements that are not known are passed over, and
+// what is no CIM-XML, or breaks off, is an error that names the place.
+
 #include <string>
 #include <string_view>
 #include <vector>
@@ -7,17 +12,12 @@
 #include "broker/Broker.h"
 #include "util/Expected.h"
 
-// CIM-XML responses (DSP0201 2.x) as plain values.
-//
-// A server is not trusted: the text is read within bounds of depth, elements that are not known are passed over, and
-// what is no CIM-XML, or breaks off, is an error that names the place.
-
 namespace zorva::cimxml {
 
-/// What an operation gave back. Which of the lists has something in it depends on the operation.
+/// The result of an operation. The operation decides which of the lists is filled.
 struct CimResponse {
-  broker::Status status;                    ///< what an ERROR element says
-  std::vector<broker::Instance> instances;  ///< with their paths, as far as the response has them
+  broker::Status status;                    ///< from an ERROR element
+  std::vector<broker::Instance> instances;  ///< with their paths, if the response has them
   std::vector<broker::ObjectPath> paths;
   std::vector<schema::ClassDeclaration> classes;
   broker::MethodResult method;

@@ -72,7 +72,7 @@ TEST_F(ResponseWriterTest, HandsTextOnInPiecesAndCannotTakeThemBack) {
   response.beginResponse("M", false);
   for (int i = 0; i < 10; ++i) {
     response.out() += std::string(20, 'x');
-    response.settle();
+    response.drainIfFull();
   }
   EXPECT_GT(pieces_.size(), 2U);
   EXPECT_FALSE(response.putError(1, "too late"));
@@ -84,7 +84,7 @@ TEST_F(ResponseWriterTest, CanStillFailALaterResponseOfTheSameMessage) {
   response.beginMessage("1", true);
   response.beginResponse("A", false);
   response.out() += std::string(100, 'x');
-  response.settle();
+  response.drainIfFull();
   response.endResponse();
   response.beginResponse("B", false);
   EXPECT_TRUE(response.putError(1, ""));

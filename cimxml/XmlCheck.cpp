@@ -10,7 +10,7 @@ namespace zorva::cimxml {
 
 namespace {
 
-// After so many bytes the checker asks whether its time is over.
+// After so many bytes the checker checks whether its time is over.
 constexpr std::size_t kBytesBetweenLooks = std::size_t{64} << 10;
 
 constexpr bool isSpace(char c) noexcept { return c == ' ' || c == '\t' || c == '\n' || c == '\r'; }
@@ -51,7 +51,7 @@ class Checker {
     return false;
   }
 
-  /// Whether all is UTF-8, and of XML's characters.
+  /// Whether all is UTF-8, and allowed in XML.
   bool characters() {
     for (std::size_t i = 0; i < text_.size();) {
       if (!goesOn(i)) return false;
@@ -68,7 +68,7 @@ class Checker {
     return true;
   }
 
-  /// One piece between, or at, the marks that XML has.
+  /// One piece of content, or one piece of markup.
   bool content() {
     const char c = text_[at_];
     if (c == '<') return markup();
@@ -119,7 +119,7 @@ class Checker {
     return fail(begin, "the encoding is not UTF-8 but " + std::string(encoding.substr(0, 40)));
   }
 
-  /// One without declarations of its own says nothing that matters.
+  /// One without its own declarations has no effect.
   bool documentType() {
     if (!text_.substr(at_).starts_with("<!DOCTYPE") || elements_ > 0)
       return fail(at_, "a declaration within a document");

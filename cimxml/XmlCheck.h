@@ -1,5 +1,9 @@
 #pragma once
 
+// Checks what the XML reader does not check, and limits the size of its result. A text that passes is well-formed UTF-8
+// of XML's characters, has one root element, refers to no entity except XML's own five, and is within the limits. The
+// reader itself checks for tags that do not match and for malformed attributes.
+
 #include <cstddef>
 #include <cstdint>
 #include <functional>
@@ -8,27 +12,23 @@
 
 #include "util/Expected.h"
 
-// What of XML 1.0 the reader behind it does not look at, and bounds on what it builds: a text that passes is
-// well-formed UTF-8 of XML's characters, has one root element, refers to no entity but XML's own five, and is no larger
-// than said. Tags that do not match, and attributes that are malformed, are left to the reader.
-
 namespace zorva::cimxml {
 
 struct XmlLimits {
-  std::size_t depth = 128;         ///< elements within one another
+  std::size_t depth = 128;         ///< nested elements
   std::size_t elements = 200'000;  ///< in all
-  /// Asked now and then while a text is read; true ends the reading. May be empty.
+  /// Called now and then while a text is read; true ends the reading. May be empty.
   std::function<bool()> isOver = {};
 };
 
-/// What the reading says that isOver has ended.
+/// The message of a reading that isOver has ended.
 inline constexpr const char* kTimeIsOver = "the time for this request was over before it was read";
 
-/// Where a text goes wrong, and how.
+/// The place of an error in a text, and its reason.
 struct XmlProblem {
   std::size_t position = 0;  ///< in bytes from 0
   std::string message;
-  bool isLimit = false;  ///< nothing is wrong but the size
+  bool isLimit = false;  ///< only the size is wrong
   bool isOver = false;   ///< the reading was ended
 };
 

@@ -8,7 +8,7 @@ namespace {
 
 using ::testing::HasSubstr;
 
-/// What is wrong with a text; empty where nothing is.
+/// The error of a text; empty if there is none.
 std::string problemOf(std::string_view text, const XmlLimits& limits = {}) {
   const auto checked = checkXml(text, limits);
   return checked ? std::string() : checked.error().message;
@@ -49,7 +49,7 @@ TEST(XmlCheck, KnowsNoEntitiesButXmlsOwn) {
   EXPECT_EQ(problemOf("<a/><!DOCTYPE a>"), "a declaration within a document");
 }
 
-TEST(XmlCheck, WantsOneRootElementAndNothingBesideIt) {
+TEST(XmlCheck, RequiresOneRootElementAndNothingBesideIt) {
   EXPECT_EQ(problemOf(""), "the text has no element");
   EXPECT_EQ(problemOf("  \n"), "the text has no element");
   EXPECT_EQ(problemOf("<a/><b/>"), "a second root element");
@@ -88,7 +88,7 @@ TEST(XmlCheck, BoundsDepthAndNumberOfElements) {
   EXPECT_EQ(problemOf("<a><b/><b/><b/><b/><b/></a>", limits), "more than 5 elements");
 }
 
-TEST(XmlCheck, TellsPlacesAsAPersonCountsThem) {
+TEST(XmlCheck, ReportsPlacesAsAPersonCountsThem) {
   EXPECT_EQ(placeText("ab\ncd", 0), "line 1, column 1");
   EXPECT_EQ(placeText("ab\ncd", 4), "line 2, column 2");
   EXPECT_EQ(placeText("ab\n", 99), "line 2, column 1");

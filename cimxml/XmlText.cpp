@@ -15,12 +15,12 @@ namespace {
 
 constexpr std::string_view kReplacement = "\xEF\xBF\xBD";
 
-/// Whether XML 1.0 (2.2) has the character at all.
+/// Whether XML 1.0 (2.2) allows the character.
 bool isXmlCharacter(std::uint32_t code) noexcept {
   return code == '\t' || code == '\n' || code == '\r' || (code >= 0x20 && code != 0xFFFE && code != 0xFFFF);
 }
 
-/// Bytes that mean nothing to XML and are a character each.
+/// Bytes that have no meaning in XML and are one character each.
 constexpr std::array<bool, 256> kPlain = [] {
   std::array<bool, 256> plain{};
   for (std::size_t byte = 0x20; byte < 0x7F; ++byte) plain[byte] = true;
@@ -28,7 +28,7 @@ constexpr std::array<bool, 256> kPlain = [] {
   return plain;
 }();
 
-/// What is written for a character that cannot stand as it is.
+/// The replacement of a character that must be escaped.
 std::string_view standIn(char character) noexcept {
   switch (character) {
     case '&':
@@ -53,7 +53,7 @@ std::string_view standIn(char character) noexcept {
   }
 }
 
-/// How many bytes at the beginning of `text` are surely plain, in whole words of eight: most texts are nothing else.
+/// How many bytes at the beginning of `text` are plain, tested in words of eight: most texts are plain.
 std::size_t plainWords(std::string_view text) noexcept {
   using Word = std::uint64_t;
   constexpr Word kOnes = 0x0101010101010101;
@@ -90,7 +90,7 @@ void appendAttribute(std::string& out, std::string_view name, std::string_view v
 }
 
 void appendEscaped(std::string& out, std::string_view text) {
-  // Nearly all text is plain: it is copied in runs, and only what ends a run is looked at by itself.
+  // Nearly all text is plain: it is copied in runs, and only the characters between the runs are tested one by one.
   std::size_t begin = 0;
   std::size_t i = plainWords(text);
   while (i < text.size()) {

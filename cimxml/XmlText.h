@@ -1,17 +1,17 @@
 #pragma once
 
+// Texts, attributes and plain values as XML has them. Output is well-formed UTF-8 for any input: characters that
+// XML 1.0 cannot hold, and bytes that are no UTF-8, come out as U+FFFD. The functions append to `out`, keep no state
+// and throw only std::bad_alloc; each may be called on any thread.
+
 #include <cstdint>
 #include <string>
 #include <string_view>
 #include <variant>
 
-// Texts, attributes and plain values as XML has them. Output is well-formed UTF-8 for any input: characters that
-// XML 1.0 cannot hold, and bytes that are no UTF-8, come out as U+FFFD. The functions append to `out`, keep no state
-// and throw only std::bad_alloc; each may be called on any thread.
-
 namespace zorva::cimxml {
 
-/// `text` with the characters escaped that mean something to XML, in content and in attributes in double quotes.
+/// `text` with XML's special characters escaped, for content and for attributes in double quotes.
 void appendEscaped(std::string& out, std::string_view text);
 
 /// A blank and `name="value"`, the value escaped.

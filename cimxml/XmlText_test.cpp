@@ -34,8 +34,8 @@ TEST(XmlText, LeavesOtherCharactersAsTheyAre) {
   EXPECT_EQ(escaped("r\xC3\xA9seau \xF0\x9F\x8C\x90"), "r\xC3\xA9seau \xF0\x9F\x8C\x90");
 }
 
-// Long texts are looked at in words: each byte must be seen at each place in one.
-TEST(XmlText, TreatsAByteAlikeWhereverItStands) {
+// Long texts are tested in words: each byte must be recognized at each place in a word.
+TEST(XmlText, TreatsAByteAlikeAtEachPosition) {
   const auto alone = [](int byte) { return escaped(std::string(1, static_cast<char>(byte))); };
   for (int byte = 0; byte < 256; ++byte) {
     for (std::size_t before = 0; before < 17; ++before) {

@@ -12,10 +12,10 @@ namespace {
 
 using pugi::xml_node;
 
-// After so many steps the reader asks whether its time is over.
+// After so many steps the reader checks whether its time is over.
 constexpr unsigned kStepsBetweenLooks = 256;
 
-/// XML requires that each attribute of an element has a name of its own.
+/// In XML all attributes of an element must have different names.
 void checkAttributes(const Reading& reading, xml_node node) {
   std::size_t count = 0;
   for (pugi::xml_attribute one = node.first_attribute(); one; one = one.next_attribute()) {
@@ -104,7 +104,7 @@ void Count::add(xml_node node, xml_node outer) {
 }
 
 void UniqueNames::add(xml_node node, const char* what, std::string_view name) {
-  if (!names_.insert(name).second) refuse(node, std::string("the ") + what + " " + quoted(name) + " stands twice");
+  if (!names_.insert(name).second) refuse(node, std::string("the ") + what + " " + quoted(name) + " is given twice");
 }
 
 }  // namespace zorva::cimxml

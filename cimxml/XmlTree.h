@@ -1,5 +1,8 @@
 #pragma once
 
+// A text as a tree of XML elements, the steps of a reader in it, and how a reader refuses what it finds. For the
+// readers of this folder alone.
+
 #include <cstddef>
 #include <initializer_list>
 #include <pugixml.hpp>
@@ -9,9 +12,6 @@
 
 #include "cimxml/ReaderLimits.h"
 #include "util/Names.h"
-
-// A text as a tree of XML elements, the steps of a reader in it, and how a reader refuses what it finds. For the
-// readers of this folder alone.
 
 namespace zorva::cimxml {
 
@@ -30,7 +30,7 @@ class Reading {
   /// `most` must outlive this.
   explicit Reading(const ReaderLimits& most) : limits(most) {}
 
-  /// To be called for each element, so that the reading ends soon after its time is over.
+  /// Call it for each element, so that the reading ends soon after its time is over.
   void step();
 
   const ReaderLimits& limits;
@@ -57,7 +57,7 @@ bool isOneOf(pugi::xml_node node, std::initializer_list<const char*> names) noex
 /// The name of an element for a message.
 std::string elementName(pugi::xml_node node);
 
-/// The first child element of one of these names; an element that is none of them is passed over.
+/// The first child element with one of these names; other elements are skipped.
 pugi::xml_node firstOf(pugi::xml_node node, std::initializer_list<const char*> names);
 
 /// The same; refused where there is none.
@@ -69,7 +69,7 @@ std::string quoted(std::string_view text);
 /// `text` without blanks at either end.
 std::string_view trimmed(std::string_view text) noexcept;
 
-/// Counts what an element repeats, and refuses one too many.
+/// Counts repeated elements, and refuses one too many.
 class Count {
  public:
   Count(std::size_t most, const char* what) : most_(most), what_(what) {}
@@ -86,11 +86,11 @@ class Count {
 /// Names that may be there only once in one element.
 class UniqueNames {
  public:
-  /// `name` lives as long as this.
+  /// `name` must live as long as this object.
   void add(pugi::xml_node node, const char* what, std::string_view name);
 
  private:
-  // An order, not a hash: whoever knows the hash could choose names that collide.
+  /// Ordered, not hashed: a client that knows the hash could choose names that collide.
   std::set<std::string_view, util::NameLess> names_;
 };
 

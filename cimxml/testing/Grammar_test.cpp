@@ -16,7 +16,7 @@ std::string propertyWith(const std::string& value) {
          value + "</VALUE></PROPERTY></INSTANCE></VALUE.OBJECT></DECLGROUP></DECLARATION></CIM>";
 }
 
-TEST(GrammarProblem, IsNothingWhereTheDocumentIsValid) { EXPECT_EQ(grammarProblem(propertyWith("TRUE")), ""); }
+TEST(GrammarProblem, IsNothingIfTheDocumentIsValid) { EXPECT_EQ(grammarProblem(propertyWith("TRUE")), ""); }
 
 TEST(GrammarProblem, NamesTheElementThatIsWrong) {
   EXPECT_THAT(grammarProblem("<CIM/>"), HasSubstr("element CIM"));

@@ -1,5 +1,5 @@
 #!/usr/bin/env python3
-"""Holds the grammar of CIM-XML against documents.txt and, where it is at hand, against DMTF's document type.
+"""Compares the grammar of CIM-XML with documents.txt and, if available, with DMTF's document type.
 
     grammar_test.py --xmllint PROGRAM --grammar cim-xml.rng --documents documents.txt [--dtd DSP0203.dtd]
 
@@ -19,7 +19,7 @@ RNG = "{http://relaxng.org/ns/structure/1.0}"
 XML = "{http://www.w3.org/XML/1998/namespace}"
 NAMESPACE = '<LOCALNAMESPACEPATH><NAMESPACE NAME="root"/></LOCALNAMESPACEPATH>'
 
-# Where an element is put that is not a whole document.
+# The context of an element that is not a whole document.
 FRAMES = [
     ('<CIM CIMVERSION="2.0" DTDVERSION="2.4">%s</CIM>', "MESSAGE DECLARATION"),
     ('<MESSAGE ID="1" PROTOCOLVERSION="1.4">%s</MESSAGE>',
@@ -44,7 +44,7 @@ PLACES = {name: frame for frame, names in FRAMES for name in names.split()}
 WORDS = ("TYPE PARAMTYPE VALUETYPE ISARRAY EmbeddedObject PROPAGATED OVERRIDABLE TOSUBCLASS TOINSTANCE TRANSLATABLE "
          "CLASS ASSOCIATION REFERENCE PROPERTY METHOD PARAMETER INDICATION").split()
 
-# Changes after which the grammar refuses what the document type accepts.
+# Changes that the grammar refuses and the document type accepts.
 STRICTER = {
     ("KEYVALUE", "without VALUETYPE"): "a key is a string where nothing else is said, so the value lacks its kind",
 }
