@@ -18,7 +18,7 @@ constexpr int kDeepestEmbedded = 8;
 
 constexpr std::size_t kNoLimit = std::numeric_limits<std::size_t>::max();
 
-/// A response is bounded as a whole, before it is read.
+/// A response has no limits of its own: its whole size is limited before it is read.
 const ReaderLimits& noLimits() {
   static const ReaderLimits limits{{}, kNoLimit, kNoLimit, kNoLimit, kNoLimit, kNoLimit, kNoLimit, kNoLimit, kNoLimit};
   return limits;
@@ -34,7 +34,7 @@ broker::Scalar numberOrText(std::string_view text) {
   return std::string(text);
 }
 
-/// The name of the element whose value stands at `place`.
+/// The name of the element that contains the value at `place`.
 std::string holderOf(xml_node place) {
   while (std::string_view(place.name()).starts_with("VALUE")) place = place.parent();
   return place.name();
@@ -315,7 +315,7 @@ broker::Scalar ElementReader::requestScalar(xml_node place, std::string text, co
   }
 }
 
-/// The instance whose element is, as text, in a value (DSP0201 5.3.2). Empty texts are null.
+/// The instance whose element is the text of a value (DSP0201 5.3.2). Empty texts are null.
 broker::Scalar ElementReader::embedded(xml_node place, const std::string& text, int nesting) {
   if (trimmed(text).empty()) return {};
   if (nesting >= kDeepestEmbedded) {

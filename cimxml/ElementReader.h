@@ -26,12 +26,12 @@ class ElementReader {
  public:
   /// Of a request. `limits` must outlive this.
   explicit ElementReader(const ReaderLimits& limits);
-  /// Of a response. Where `classes`, which must outlive this, knows a class, instances and properties refer to it.
+  /// Reads a response. If `classes`, which must outlive this object, has a class, instances and properties refer to it.
   explicit ElementReader(const schema::ClassRepository& classes);
 
   Reading& reading() noexcept { return reading_; }
 
-  /// The value of an attribute; of a response, empty where it is not there.
+  /// The value of an attribute; in a response, empty if it is missing.
   std::string_view attribute(pugi::xml_node node, const char* name) const;
 
   /// The text of an element, joined from its pieces.
@@ -53,14 +53,14 @@ class ElementReader {
   /// INSTANCE.
   broker::Instance instance(pugi::xml_node node) { return instance(node, 0); }
 
-  /// The type that an attribute names; string where it is not there.
+  /// The type in an attribute; string if it is missing.
   schema::Type typeOf(pugi::xml_node node, const char* attribute) const;
   ValueKind kindOf(pugi::xml_node node, const char* typeAttribute) const;
 
   /// VALUE, VALUE.ARRAY, VALUE.REFERENCE or VALUE.REFARRAY.
   broker::Value value(pugi::xml_node node, const ValueKind& kind) { return value(node, kind, 0); }
 
-  /// The first of those in `holder`; null where it has none.
+  /// The first of these elements in `holder`; null if it has none.
   broker::Value valueIn(pugi::xml_node holder, const ValueKind& kind);
 
  private:

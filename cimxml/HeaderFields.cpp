@@ -13,7 +13,7 @@ bool isPlain(char c) noexcept {
          std::string_view("-._~/:").find(c) != std::string_view::npos;
 }
 
-/// The byte that "%41" at the begin of `text` stands for; nothing where "%" lacks its two digits.
+/// The byte of a "%41" at the beginning of `text`; nothing if "%" lacks its two digits.
 std::optional<char> escapedByte(std::string_view text) noexcept {
   if (text.size() < 3) return std::nullopt;
   unsigned byte = 0;
@@ -24,7 +24,7 @@ std::optional<char> escapedByte(std::string_view text) noexcept {
 
 struct Decoded {
   std::string text;
-  bool isWhole = true;  ///< each "%" has its digits
+  bool isWhole = true;  ///< each "%" has its two digits
 };
 
 Decoded decode(std::string_view value) {

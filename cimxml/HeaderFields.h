@@ -12,10 +12,10 @@ namespace zorva::cimxml {
 /// `text` as the value of a field: "%" and two digits for each byte but letters, digits and some signs.
 std::string fieldValue(std::string_view text);
 
-/// The text that fieldValue came from, for a person: a "%" that no two digits follow stands for itself.
+/// Decodes fieldValue() for a person: a "%" without two digits after it is kept.
 std::string fieldText(std::string_view value);
 
-/// The same for a program: nothing where a "%" lacks its two digits, or the text is no UTF-8.
+/// Decodes fieldValue() for a program: nothing if a "%" lacks its two digits, or the text is not UTF-8.
 std::optional<std::string> strictFieldText(std::string_view value);
 
 }  // namespace zorva::cimxml

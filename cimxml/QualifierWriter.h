@@ -10,7 +10,7 @@
 
 namespace zorva::cimxml {
 
-/// An attribute that is "true" or "false"; none where the value is the one that the DTD has `unlessSaid`.
+/// An attribute that is "true" or "false"; none if the value is the DTD's default `unlessSaid`.
 void appendFlag(std::string& out, std::string_view name, bool value, bool unlessSaid);
 
 /// VALUE or VALUE.ARRAY; nothing for null. Nothing for a reference's default value: the DTD has no place for a path

@@ -72,7 +72,7 @@ broker::Value readArgument(xml_node node, ElementReader& reader) {
   return reader.value(value, kind);
 }
 
-/// The type that PARAMTYPE names; nothing where it is left out.
+/// The type that PARAMTYPE names; nothing if it is missing.
 std::optional<schema::Type> saidType(xml_node node, const ElementReader& reader) {
   if (!node.attribute("PARAMTYPE")) return std::nullopt;
   return reader.typeOf(node, "PARAMTYPE");

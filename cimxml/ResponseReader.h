@@ -2,8 +2,8 @@
 
 // CIM-XML responses (DSP0201 2.x) as plain values.
 //
-// A server is not trusted: the text is read within bounds of depth, elements that are not known are passed over, and
-// what is no CIM-XML, or breaks off, is an error that names the place.
+// A server is not trusted: the depth of the text is limited, unknown elements are skipped, and a text that is no
+// CIM-XML, or is incomplete, is an error that names the place.
 
 #include <string>
 #include <string_view>
@@ -24,11 +24,11 @@ struct CimResponse {
 };
 
 struct ResponseError {
-  std::string message;  ///< why the text is no CIM-XML response; has what the server sent in it, as it came
+  std::string message;  ///< why the text is no CIM-XML response; contains text from the server, unescaped
 };
 
-/// Reads a whole response; `text` is used up. Where `classes` knows a class, keys get the types that it declares,
-/// and instances and properties refer to their declarations. What the response leaves out of a path is left empty.
+/// Reads a whole response; `text` is modified. If `classes` has a class, keys get the declared types, and instances and
+/// properties refer to their declarations. Parts that the response leaves out of a path are left empty.
 Expected<CimResponse, ResponseError> readResponse(std::string text, const schema::ClassRepository& classes);
 
 }  // namespace zorva::cimxml

@@ -32,7 +32,7 @@ struct XmlProblem {
   bool isOver = false;   ///< the reading was ended
 };
 
-/// What is wrong with a text, where it does not pass. Takes time in proportion to the text, and no memory.
+/// The error of a text that does not pass. Takes time in proportion to the text, and no memory.
 Expected<void, XmlProblem> checkXml(std::string_view text, const XmlLimits& limits);
 
 /// "line L, column C" of a byte, both from 1, the column counted in bytes.

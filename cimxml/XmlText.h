@@ -27,7 +27,7 @@ class PlainContent {
   void operator()(bool value) const { out += value ? "TRUE" : "FALSE"; }
   void operator()(std::uint64_t value) const;
   void operator()(std::int64_t value) const;
-  /// With a decimal point; what is no number has words of its own.
+  /// With a decimal point; values that are not numbers have special words.
   void operator()(double value) const;
   /// One unit of UTF-16.
   void operator()(char16_t value) const;

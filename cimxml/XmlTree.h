@@ -1,7 +1,7 @@
 #pragma once
 
-// A text as a tree of XML elements, the steps of a reader in it, and how a reader refuses what it finds. For the
-// readers of this folder alone.
+// A text as a tree of XML elements, the steps of a reader in it, and the errors of a reader. Only for the readers of
+// this folder.
 
 #include <cstddef>
 #include <initializer_list>
@@ -24,7 +24,7 @@ struct Refusal {
 
 [[noreturn]] void refuse(pugi::xml_node node, std::string message, Fault fault = Fault::NotLooselyValid);
 
-/// What holds for the reading of one text, those that are embedded in it included.
+/// The state of reading one text, including the texts embedded in it.
 class Reading {
  public:
   /// `most` must outlive this.
@@ -39,8 +39,8 @@ class Reading {
   unsigned steps_ = 0;
 };
 
-/// What the elements of this folder's texts are parsed with: everything but comments and processing instructions is
-/// kept, blanks where they are all that an element has.
+/// The parser options for all texts of this folder: everything except comments and processing instructions is kept, and
+/// also blanks that are the only content of an element.
 inline constexpr unsigned kParseFlags = pugi::parse_cdata | pugi::parse_escapes | pugi::parse_eol |
                                         pugi::parse_wconv_attribute | pugi::parse_ws_pcdata_single;
 
@@ -60,7 +60,7 @@ std::string elementName(pugi::xml_node node);
 /// The first child element with one of these names; other elements are skipped.
 pugi::xml_node firstOf(pugi::xml_node node, std::initializer_list<const char*> names);
 
-/// The same; refused where there is none.
+/// The same; an error if there is none.
 pugi::xml_node required(pugi::xml_node node, std::initializer_list<const char*> names);
 
 /// The text in double quotes for a message, cut to a length that one can read.

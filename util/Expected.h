@@ -4,8 +4,8 @@
 #include <type_traits>
 #include <utility>
 
-// What a function gives back that its caller must expect to fail: the value, or what is wrong. Each folder has its own
-// types of errors, which say what is wrong and where.
+// The result of a function that its caller must expect to fail: the value or the error. Each folder has its own types
+// of errors, which say what is wrong and where.
 
 namespace zorva {
 
