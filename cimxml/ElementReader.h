@@ -1,11 +1,11 @@
 #pragma once
 
-// Names, values and instances (DSP0201 2.4), which requests and responses both have, as plain values. For the readers
-// of this folder alone; the functions throw Refusal.
+// Names, values and instances (DSP0201 2.4), which requests and responses both have, as plain values. Only for the
+// readers of this folder; the functions throw Refusal.
 //
-// A request is held to its form: what must be there is there, once, and within ReaderLimits. Its values keep the form
-// of the text where only the schema can tell their type; the broker converts them. Of a response, what is missing is
-// left empty; its values get the types that its elements say, and its keys those that the classes declare.
+// The form of a request is checked: every required part must be there, once, and within ReaderLimits. Its values stay
+// texts if only the schema can decide their type; the broker converts them. Missing parts of a response are left empty.
+// Its values get the types in its elements, and its keys the types that the classes declare.
 
 #include <string>
 #include <string_view>
