@@ -22,12 +22,12 @@ std::set<std::string> pathsOfInterface(const std::string& name) {
       if (nodeName != nullptr && *nodeName == name) paths.insert(node.path());
     }
   } catch (const std::exception&) {
-    // Without a tree the names in the paths must do.
+    // Without a tree the names in the paths are used.
   }
   return paths;
 }
 
-// The name before the last one: the port's, in the path of a port's configuration.
+// The second-last name: the port's, in the path of a port's configuration.
 std::string portOfPath(const std::string& path) {
   const std::size_t end = path.rfind('/');
   if (end == std::string::npos || end == 0) return {};

@@ -94,7 +94,7 @@ TEST_F(AgentTest, ASourceThatThrowsAnythingLeavesTheKernelsName) {
   EXPECT_EQ(getSystemName(), kernelName());
 }
 
-TEST_F(AgentTest, AWrongConfigurationReachesSelectNodeOfAProgramThatAskedAsOneLineAndEverythingElseGoesOn) {
+TEST_F(AgentTest, AWrongConfigurationReachesSelectNodeOfAProgramThatAskedAsOneLineAndEverythingElseContinues) {
   ::setenv("ZORVAGENT_CONFIG", directory_.write("agent.toml", "[agent]\nlangauge = \"en\"\n").c_str(), 1);
   const std::string expected = directory_ / "agent.toml:2: agent.langauge: is not a known key";
   askForExceptions();
@@ -112,7 +112,8 @@ TEST_F(AgentTest, AWrongConfigurationReachesSelectNodeOfAProgramThatAskedAsOneLi
   EXPECT_STREQ(getMaroviaDataDir(), "/var/lib/zorvagent/");
   EXPECT_THROW(currentConfig(), ConfigError);
   EXPECT_THROW(overlayEntries(), ConfigError);
-  EXPECT_NE(::testing::internal::GetCapturedStderr().find(expected), std::string::npos) << "the operator is told";
+  EXPECT_NE(::testing::internal::GetCapturedStderr().find(expected), std::string::npos)
+      << "the operator gets a message";
 }
 
 TEST_F(AgentTest, LoadingAWrongConfigurationThrowsAndLeavesTheOldOne) {
@@ -157,7 +158,7 @@ TEST_F(AgentTest, NothingIsReadAgainWhileNothingChanges) {
   const auto source = std::make_shared<Counting>(treeNamed("host1"));
   setTreeSource(source);
   const auto first = currentTree();
-  // Past the time when files are compared.
+  // After this many checks, files are watched and no longer compared.
   for (int i = 0; i < 2 * FileWatch::kComparisons; ++i) ASSERT_EQ(currentTree(), first) << "the same snapshot";
   EXPECT_EQ(source->reads, 1);
 }
@@ -172,7 +173,7 @@ TEST_F(AgentTest, AForkWaitsUntilNoThreadIsInsideSoThatTheChildCanGoOn) {
       try {
         currentTree();
       } catch (const ConfigError&) {
-        // Seen while it was being written.
+        // The file was read while it was being written.
       }
     }
   });
@@ -182,7 +183,7 @@ TEST_F(AgentTest, AForkWaitsUntilNoThreadIsInsideSoThatTheChildCanGoOn) {
       try {
         currentTree();
       } catch (const ConfigError&) {
-        // As above.
+        // The file was read while it was being written.
       }
       return true;
     });
@@ -216,7 +217,7 @@ TEST(AgentLibrary, IsLoadedAndUnloadedAHundredTimesAndReallyGone) {
   EXPECT_EQ(openDescriptors(), before);
 }
 
-// The lines that a command prints.
+// The output lines of a command.
 std::vector<std::string> linesOf(const std::string& command) {
   std::vector<std::string> lines;
   FILE* pipe = ::popen(command.c_str(), "r");

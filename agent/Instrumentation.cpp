@@ -32,7 +32,7 @@ using zorva::agent::TreeSnapshot;
 
 struct Instrumentation::Position {
   std::shared_ptr<const TreeSnapshot> snapshot;
-  const Node* node = nullptr;  // of the snapshot; null where the cursor stands on none
+  const Node* node = nullptr;  // of the snapshot; null if the cursor is on none
   bool walksByType = false;    // operator++ has a next node to go to
 };
 
@@ -62,7 +62,7 @@ void Instrumentation::selectNode(NodeLexicon::NodeType type) {
   }
   auto position = std::make_unique<Position>();
   position->snapshot = std::move(snapshot);
-  // The other types of nodes have numbers of the agent's own, which are no numbers of this enumeration.
+  // The agent's own node types have numbers that are not in this enumeration.
   if (type == NodeLexicon::NODE_NETWORK_IP_CONFIG) {
     position->node = position->snapshot->nextOfType(NodeType::NetworkIPConfig, 0);
     position->walksByType = true;

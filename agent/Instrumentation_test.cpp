@@ -51,7 +51,7 @@ class InstrumentationTest : public ::testing::Test {
   zorva::agent::testing::TemporaryDirectory directory_;
 };
 
-TEST_F(InstrumentationTest, ANewCursorStandsOnNoNode) {
+TEST_F(InstrumentationTest, ANewCursorIsOnNoNode) {
   const Instrumentation cursor;
   EXPECT_FALSE(cursor);
   EXPECT_EQ(nameAt(cursor), "none");
@@ -143,7 +143,7 @@ TEST_F(InstrumentationTest, AListIsPutInThePlaceOfWhatTheVectorHeld) {
   EXPECT_EQ(list, (std::vector<std::string>{"a.org", "b.org"}));
 }
 
-TEST_F(InstrumentationTest, ACopyStandsOnTheSameNodeAndMovesOnItsOwn) {
+TEST_F(InstrumentationTest, ACopyIsOnTheSameNodeAndMovesIndependently) {
   Instrumentation cursor;
   cursor.selectNode(NODE_NETWORK_IP_CONFIG);
   Instrumentation copy(cursor);
@@ -184,7 +184,7 @@ struct FailingSource : zorva::agent::TreeSource {
   std::string problem = "no kernel";
 };
 
-TEST_F(InstrumentationTest, ASourceThatThrowsLeavesTheCursorWhereItWasWhereAProgramAskedForThat) {
+TEST_F(InstrumentationTest, ASourceThatThrowsDoesNotMoveTheCursorIfAProgramAskedForThat) {
   zorva::agent::askForExceptions();
   Instrumentation cursor;
   cursor.selectNode(NODE_NETWORK_IP_CONFIG);

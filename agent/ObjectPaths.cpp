@@ -10,7 +10,7 @@
 namespace ZV {
 namespace {
 
-// References stand in references; a path that goes deeper is no key of anything real.
+// References may be nested; no real key goes deeper than this.
 constexpr int kDeepestReference = 16;
 
 struct Key {
@@ -18,14 +18,14 @@ struct Key {
   CMPIData value;
 };
 
-// A path as it is compared.
+// A path in the form in which it is compared.
 struct Path {
   std::string className;
   std::string nameSpace;
   std::vector<Key> keys;
 };
 
-// Names are CIM identifiers, whose letters have case in ASCII alone here, whatever the process's locale says.
+// Names are CIM identifiers: only their ASCII letters have case, independent of the process's locale.
 char lower(char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c; }
 
 std::string folded(std::string text) {
@@ -38,7 +38,7 @@ bool isNull(const Object* object) {
   return object == nullptr || object->hdl == nullptr || object->ft == nullptr;
 }
 
-// The text of a string object, empty where there is none, or nothing where it cannot be read.
+// The text of a string object, empty if it has none, or nothing if it cannot be read.
 std::optional<std::string> textOf(const CMPIString* string, const CMPIStatus& status) {
   if (status.rc != CMPI_RC_OK) return std::nullopt;
   if (isNull(string)) return std::string();
@@ -57,7 +57,7 @@ std::optional<std::string> nameOf(const CMPIObjectPath* path, Getter get) {
   return text;
 }
 
-// The value alone says whether one is there: servers leave any state beside a good value.
+// Only the value is checked: servers leave any state beside a good value.
 bool isNull(const CMPIData& data) {
   switch (data.type) {
     case CMPI_null:
@@ -83,7 +83,7 @@ std::optional<Key> keyAt(const CMPIObjectPath* path, CMPICount index) {
   return Key{folded(*text), value};
 }
 
-// The path with its names in small letters and its keys by name; nothing where it cannot be read.
+// The path with its names in small letters and its keys by name; nothing if it cannot be read.
 std::optional<Path> readPath(const CMPIObjectPath* object) {
   if (isNull(object)) return std::nullopt;
   const auto className = nameOf(object, object->ft->getClassName);
@@ -118,7 +118,7 @@ std::optional<std::string> dateOf(const CMPIDateTime* date) {
   return textOf(text, status);
 }
 
-// Nothing equals what cannot be read.
+// A text that cannot be read equals no other text.
 bool equalTexts(const std::optional<std::string>& left, const std::optional<std::string>& right) {
   return left.has_value() && right.has_value() && *left == *right;
 }

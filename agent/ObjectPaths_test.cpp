@@ -2,7 +2,7 @@
 
 #include <gtest/gtest.h>
 
-#include "RecordingBroker.h"
+#include "tests/support/RecordingBroker.h"
 
 namespace {
 

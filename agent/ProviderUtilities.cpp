@@ -9,7 +9,7 @@ namespace {
 constexpr std::size_t kLongestLabel = 63;  // RFC 1035, 2.3.4
 constexpr std::size_t kLongestName = 253;  // its 255 octets of wire form, as text without the final dot
 
-// ASCII alone, whatever the process's locale says.
+// Only ASCII, independent of the process's locale.
 bool isAllowed(char c) {
   return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') || c == '-' || c == '_';
 }

@@ -71,7 +71,7 @@ std::shared_ptr<const TreeSnapshot> Runtime::lookAndRead() {
   if (source_ == nullptr) source_ = makeSource(config);
   if (!overlay_.has_value()) overlay_.emplace(config.dataDir);
 
-  // Both are asked every time, so that neither piles up reports.
+  // Both are asked every time, so that no events pile up in either.
   const bool sourceChanged = source_->changed();
   const bool overlayChanged = overlay_->changed();
   if (sourceChanged) sourceTree_ = nullptr;
@@ -89,7 +89,7 @@ std::shared_ptr<const TreeSnapshot> Runtime::lookAndRead() {
   return latest_;
 }
 
-// What was opened before the fork belongs to the parent: reports that are read here would be missing there.
+// Descriptors that were opened before the fork belong to the parent: events that are read here would be missing there.
 void Runtime::followFork() {
   process_ = ::getpid();
   overlay_.reset();
@@ -121,7 +121,7 @@ std::shared_ptr<const TreeSnapshot> Runtime::lookForCursor() {
   return nullptr;
 }
 
-// A server asks again with every request.
+// A server asks again with every request, so the same problem is reported once.
 void Runtime::reportOnce(const std::string& problem) {
   if (problem == reported_) return;
   reported_ = problem;
@@ -144,8 +144,8 @@ std::string Runtime::systemName() {
   if (const std::string& name = current.get().systemName; !name.empty()) return name;
   if (current.isWrong()) return util::kernelHostName();
   try {
-    // Of the tree that the latest cursor was placed in: a name is told many times in one operation, and must not change
-    // on the way.
+    // Of the tree in which the latest cursor was placed: the name is used many times in one operation and must not
+    // change in between.
     const std::shared_ptr<const TreeSnapshot> tree = latestForCursor();
     return tree == nullptr || tree->systemName().empty() ? util::kernelHostName() : tree->systemName();
   } catch (...) {
@@ -167,7 +167,7 @@ bool Runtime::store(const std::string& path, PropertyNumber property, const Prop
   if (node == nullptr || node->type() != NodeType::NetworkIPConfig) {
     throw std::invalid_argument("no such node has an IP configuration");
   }
-  // The source's own value needs no entry, and is followed from now on wherever it goes.
+  // The source's own value needs no entry; from now on the source's changes are visible.
   const Property* own = node->find(property);
   const bool same = own != nullptr && equalValues(own->value, value);
   overlay().set(path, property, same ? std::nullopt : std::optional<PropertyValue>(value));

@@ -1,5 +1,6 @@
-// The state of the agent in this process: source, overlay, latest snapshot.
 #pragma once
+
+// The state of the agent in this process: source, overlay, latest snapshot.
 
 #include <sys/types.h>
 
@@ -16,35 +17,36 @@
 
 namespace zorva::agent {
 
-// One for the process, made when it is first asked for, ended when the library is unloaded. Thread-safe. A fork waits
-// until nobody is inside, so that the child finds it whole.
+/// One for the process, made at its first use, destroyed when the library is unloaded. Thread-safe. A fork waits until
+/// no thread is inside, so that the child gets a consistent state.
 class Runtime {
  public:
   static Runtime& instance();
 
-  // Takes this configuration, and lets go of the source and the snapshot that came from another.
+  /// Uses this configuration, and drops the source and the snapshot of another one.
   void useConfig(const Config& config);
 
-  // The tree as it is now: looks for changes and reads again where there are any. Throws what the source throws, after
-  // it has been logged, or a ConfigError.
+  /// The current tree: checks for changes and reads again if there are any. Throws the source's exceptions, after they
+  /// are logged, or a ConfigError.
   std::shared_ptr<const TreeSnapshot> look();
 
-  // The tree as it was at the last look; looks where there was none.
+  /// The tree as of the last check; checks if there was none.
   std::shared_ptr<const TreeSnapshot> latest();
 
-  // The same two for a cursor, which throw only where a program has asked for exceptions. Otherwise null where the tree
-  // cannot be read, with a line to the log whenever the reason is another one, and the first one to syslog.
+  /// The same two for a cursor. They throw only if the program has asked for exceptions. Otherwise they return null if
+  /// the tree cannot be read, with a line to the log whenever the reason is a new one, and the first one to syslog.
   std::shared_ptr<const TreeSnapshot> lookForCursor();
   std::shared_ptr<const TreeSnapshot> latestForCursor();
   void askForExceptions() { throws_ = true; }
 
-  // The system's name. Never throws but std::bad_alloc.
+  /// The system's name. Throws only std::bad_alloc.
   std::string systemName();
 
-  // Stores a value of the node at that path in the overlay. False, with the reason in the log, where that fails.
+  /// Stores a value of the node at that path in the overlay. False, with the reason in the log, if that fails.
   bool store(const std::string& path, PropertyNumber property, const PropertyValue& value);
 
-  // The overlay of the configured data directory. Throws ConfigError. Who changes it tells of that.
+  /// The overlay of the configured data directory. Throws ConfigError. The caller must announce a change with
+  /// overlayHasChanged().
   Overlay overlay();
   void overlayHasChanged();
 
@@ -63,18 +65,18 @@ class Runtime {
 
   std::atomic<bool> throws_ = false;
 
-  std::mutex lookMutex_;  // over everything from here to latestMutex_
-  pid_t process_;         // whose sockets and watches these are
+  std::mutex lookMutex_;  ///< guards everything from here to latestMutex_
+  pid_t process_;         ///< the process that owns the sockets and watches
   std::shared_ptr<TreeSource> source_;
-  bool sourceIsGiven_ = false;  // it does not come from the configuration
+  bool sourceIsGiven_ = false;  ///< not from the configuration
   std::optional<OverlayReader> overlay_;
-  std::shared_ptr<const TreeSnapshot> sourceTree_;  // null: to be read again
+  std::shared_ptr<const TreeSnapshot> sourceTree_;  ///< null: must be read again
   bool overlayStale_ = true;
   bool latestStale_ = true;
-  std::string reported_;           // the problem of the last look for a cursor; empty where it went well
-  bool syslogIsInformed_ = false;  // of the first one
+  std::string reported_;           ///< the problem of the last check for a cursor; empty if there was none
+  bool syslogIsInformed_ = false;  ///< syslog has the first problem
 
-  std::mutex latestMutex_;  // taken within lookMutex_, never the other way round
+  std::mutex latestMutex_;  ///< may be taken while lookMutex_ is held, never the other way round
   std::shared_ptr<const TreeSnapshot> latest_;
 };
 

@@ -25,8 +25,7 @@ constexpr const char* kKeptName = "settings.before";
 constexpr std::size_t kLargestFile = std::size_t{16} << 20U;
 constexpr std::size_t kLongestName = 255;
 
-// Who may put files into the directory may lock it. Nobody else: a lock that anybody can hold is one that anybody can
-// keep from others.
+// Only users who may put files into the directory may lock it: any other user could hold the lock for ever.
 mode_t lockRights(const std::string& directory) {
   struct stat status {};
   if (::stat(directory.c_str(), &status) != 0) return 0600;
@@ -40,14 +39,14 @@ util::FileDescriptor openForChange(const std::string& directory, const char* nam
   if (!file && errno == ENOENT) throw std::runtime_error(directory + ": there is no such data directory");
   if (!file) util::throwFileError(directory + name, "cannot be opened");
   struct stat status {};
-  // What the process masks of new files' rights.
+  // Restores the rights that the process's umask removes from new files.
   if (::fstat(file.get(), &status) == 0 && (status.st_mode & 0666) != rights && status.st_uid == ::geteuid()) {
     ::fchmod(file.get(), rights);
   }
   return file;
 }
 
-// None where that file cannot be opened, or made.
+// None if that file cannot be opened or made.
 util::FileDescriptor openForRead(const std::string& directory, const char* name) {
   util::FileDescriptor file = openLockFile(directory + name, lockRights(directory));
   if (file) return file;
@@ -63,7 +62,7 @@ bool canBeAName(const std::string& interface) {
          interface.find_first_of(std::string("/\0\n", 3)) == std::string::npos;
 }
 
-// The lock with the turn taken before it.
+// Takes the turn, then the lock.
 FileLock takeInTurn(util::FileDescriptor turn, util::FileDescriptor lock, const std::string& directory,
                     FileLock::Mode mode, FileLock::Deadline deadline) {
   std::optional<FileLock> myTurn;
@@ -75,7 +74,7 @@ FileLock takeInTurn(util::FileDescriptor turn, util::FileDescriptor lock, const 
 
 class SettingsLock::Core {
  public:
-  // Waits for the exclusive lock, and puts back what another process left.
+  // Waits for the exclusive lock, and undoes another process's unfinished change.
   explicit Core(const std::string& directory, FileLock::Deadline deadline)
       : directory_(directory),
         lock_(takeInTurn(openForChange(directory, kTurnName), openForChange(directory, kLockName), directory,
@@ -88,7 +87,7 @@ class SettingsLock::Core {
       : directory_(directory),
         lock_(takeInTurn(std::move(turn), std::move(file), directory, FileLock::Mode::Shared, deadline)) {}
 
-  // Whether the file of an interface was being changed when the process ended that did it.
+  // Whether a process ended while it was changing the file of an interface.
   bool isSomethingLeft() const {
     struct stat status {};
     return ::fstat(lock_.descriptor(), &status) == 0 && status.st_size > 0;
@@ -106,8 +105,8 @@ class SettingsLock::Core {
 
   std::string directory_;
   FileLock lock_;
-  std::string interface_;  // whose file is kept aside; empty: none
-  std::string before_;     // its text
+  std::string interface_;  // whose file is saved; empty: none
+  std::string before_;     // the text of the saved file
 };
 
 std::string SettingsLock::Core::nameInLock() const {
@@ -137,13 +136,13 @@ void SettingsLock::Core::forget() {
 
 void SettingsLock::Core::keepAside(const std::string& interface) {
   putBackWhatIsLeft();
-  if (!canBeAName(interface)) return;  // no file has such a name
+  if (!canBeAName(interface)) return;  // no file can have such a name
   const std::string path = interfaceFile(directory_, interface);
   util::FileText file = util::readFile(path, kLargestFile);
   if (file.truncated) throw std::runtime_error(path + ": is larger than 16 MiB, and is left as it is");
   if (util::mayPass(file.error))
     throw std::runtime_error(path + ": cannot be read: " + util::fileErrorText(file.error));
-  if (file.error != 0) return;  // what cannot be read cannot be rewritten
+  if (file.error != 0) return;  // a file that cannot be read cannot be rewritten
   struct stat rights {};
   if (::stat(path.c_str(), &rights) != 0) util::throwFileError(path, "cannot be looked at");
   const std::string unsynced = util::replaceFile(directory_, kKeptName, file.text, &rights);
@@ -153,8 +152,7 @@ void SettingsLock::Core::keepAside(const std::string& interface) {
   before_ = std::move(file.text);
 }
 
-// In place, so that the file keeps its owner and its links. A full disk may not take that; what is kept aside then
-// takes the file's place.
+// In place, so that the file keeps its owner and its links. If a full disk prevents that, the saved file replaces it.
 void SettingsLock::Core::putBack(const std::string& path, const std::string& text) const {
   try {
     util::overwriteFile(path, text);
@@ -219,7 +217,7 @@ SettingsLock::SettingsLock(const std::string& directory, Access access) {
     try {
       const Core exclusive(directory, deadline);
     } catch (const std::exception& error) {
-      // Who may not write leaves it to somebody who may.
+      // If this process may not write, another one will do it.
       ZORVAGENT_LOG_ERROR(error.what());
     }
   }

@@ -42,7 +42,7 @@ TEST(SettingsLock, ReadersShareItAndAChangeHasItAlone) {
   EXPECT_FALSE(canLock(directory / "settings.lock", LOCK_SH));
 }
 
-TEST(FileLock, WaitsNoLongerThanItIsTold) {
+TEST(FileLock, WaitsNoLongerThanAllowed) {
   const TemporaryDirectory directory;
   const std::string path = directory / "lock";
   const FileLock held(path);
@@ -122,7 +122,7 @@ TEST(SettingsLock, WhoMayNotOpenItReadsAllTheSame) {
   }));
 }
 
-/// A change in which the file becomes that text.
+/// Makes a change after which the file has that text.
 std::string finishAfter(const TemporaryDirectory& directory, const std::string& text) {
   directory.write("ifcfg-eth0", kFile);
   SettingsLock lock(directory.path(), Access::Change);
@@ -174,7 +174,7 @@ TEST(SettingsLock, TheFileThatIsKeptAsideIsAsClosedToOthersAsItself) {
   EXPECT_EQ(status.st_mode & 0777U, 0600U);
 }
 
-/// Leaves the data directory as a process does that is killed when the file has become that text.
+/// Leaves the data directory as a process does that is killed when the file has that text.
 void dieAfter(const TemporaryDirectory& directory, const std::string& text) {
   directory.write("ifcfg-eth0", kFile);
   const pid_t child = testing::startChild([&] {
@@ -206,7 +206,7 @@ TEST(SettingsLock, AChangeThatWasWholeWhenItsProcessWasKilledStays) {
   EXPECT_THAT(contentsOf(directory / "ifcfg-eth0"), HasSubstr("HOSTNAME=new\n"));
 }
 
-TEST(SettingsLock, ALockFileWithNonsenseInItHarmsNobody) {
+TEST(SettingsLock, ALockFileWithNonsenseInItIsHarmless) {
   const TemporaryDirectory directory;
   directory.write("settings.before", kFile);
   directory.write("ifcfg-eth0", "");
@@ -218,7 +218,7 @@ TEST(SettingsLock, ALockFileWithNonsenseInItHarmsNobody) {
   }
 }
 
-TEST(SettingsLock, AFileBehindALinkIsPutBackWhereItIs) {
+TEST(SettingsLock, TheTargetOfALinkIsRestoredInPlace) {
   const TemporaryDirectory directory;
   directory.write("elsewhere/file", kFile);
   directory.link(directory / "elsewhere/file", "ifcfg-eth0");

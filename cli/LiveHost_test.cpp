@@ -1,4 +1,5 @@
-// zorvactl on real interfaces, in a network namespace of its own where the kernel permits that.
+// zorvactl on real interfaces, in its own network namespace if the kernel permits that.
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
@@ -17,7 +18,7 @@ constexpr const char* kHostConfig = "[agent]\ndata_dir = \"DIR\"\n[tree]\nsource
 
 bool canMakeNetworks() { return std::system("unshare -rn sh -c 'ip link add zv0 type bridge' >/dev/null 2>&1") == 0; }
 
-/// Runs a script of a shell in a new network, where $Z is zorvactl; gives what it printed.
+/// Runs a shell script in a new network, with zorvactl in $Z; returns its output.
 std::string printedInNewNetwork(const TestHost& host, const std::string& script) {
   const std::string file =
       host.directory().write("script", "export ZORVAGENT_CONFIG=" + (host.directory() / "agent.toml") +

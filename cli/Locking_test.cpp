@@ -1,4 +1,5 @@
-// Programs that read and change the settings of one host at the same time, and those that end in the middle.
+// Programs that read and change the settings of one host at the same time, and those that are killed in the middle.
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <signal.h>
@@ -40,7 +41,7 @@ class Locking : public testing::Test {
 
   std::string file() const { return contentsOf(host_.dataFile("ifcfg-eth0")); }
 
-  /// Runs it; false, with what it said, where it failed or warned.
+  /// Runs it; false, with its output, if it failed or warned.
   bool runs(const Words& words) const {
     const Outcome outcome = host_.run(words);
     if (outcome.exitCode == 0 && outcome.err.empty()) return true;
@@ -113,7 +114,7 @@ TEST_F(Locking, WhatSeveralProgramsAddToAListIsAllThere) {
   for (int i = 1; i <= 8; ++i) EXPECT_THAT(servers, HasSubstr("192.0.2." + std::to_string(i) + "\n"));
 }
 
-/// A change that makes the file longer than any may be.
+/// A change after which the file would be longer than allowed.
 const Words kTooLong{"modify", kSetting, "ConfigurationName=" + std::string(10000, 'x'), "DomainName=new.example"};
 constexpr std::size_t kMostBytes = 5000;
 
@@ -156,14 +157,14 @@ TEST_F(Killed, TheServerPutsTheFileBackWhenItStarts) {
 }
 
 TEST_F(Killed, WhoMayNotWriteReadsWhatThereIs) {
-  const Outcome outcome = host_.runAsNobody({"gi", kSetting});
+  const Outcome outcome = host_.runUnprivileged({"gi", kSetting});
   if (outcome.exitCode == 127) GTEST_SKIP() << "another user cannot run what was built here";
   EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
 }
 
 TEST_F(Locking, WhoMayNotWriteReadsWhileOthersChange) {
   const zorva::agent::SettingsLock change(host_.dataFile(""), zorva::agent::Access::Change);
-  const Outcome outcome = host_.runAsNobody({"gi", kSetting});
+  const Outcome outcome = host_.runUnprivileged({"gi", kSetting});
   if (outcome.exitCode == 127) GTEST_SKIP() << "another user cannot run what was built here";
   EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
   EXPECT_EQ(outcome.err, "");

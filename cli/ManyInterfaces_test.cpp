@@ -1,4 +1,5 @@
 // zorvactl on hosts with very many interfaces.
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <sys/resource.h>
@@ -16,7 +17,7 @@ using testing::Each;
 using testing::EndsWith;
 using testing::HasSubstr;
 
-/// The seconds of processor time that children of this process have taken.
+/// The processor time in seconds that children of this process have used.
 double secondsOfChildren() {
   rusage usage{};
   ::getrusage(RUSAGE_CHILDREN, &usage);
@@ -75,7 +76,7 @@ TEST(ManyInterfaces, AGraphFollowsTheFirstObjectsAndSaysSo) {
   EXPECT_THAT(outcome.err, AllOf(HasSubstr("zorvactl: note: of this many objects "), HasSubstr("--all asks all")));
 }
 
-TEST(ManyInterfaces, ALineSaysWhatTakesLongAndGoesAgain) {
+TEST(ManyInterfaces, ALineSaysWhatTakesLongAndIsErased) {
   const TestHost host(TestHost::manyInterfaces(700));
   const Outcome outcome = host.run({"classes", "--all"}, OutputTo::ErrorTerminal);
   EXPECT_EQ(outcome.exitCode, 0);

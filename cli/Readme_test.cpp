@@ -1,4 +1,5 @@
-// What README.md shows and tells people to type, on the host that it shows.
+// The examples in README.md, on the host that it shows.
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
@@ -19,7 +20,7 @@ TestHost shownHost() {
                    TestHost::port("eth1", R"("dns_server_addresses": [])")});
 }
 
-/// What stands in backquotes of its own lines after that text.
+/// The code block after that text.
 std::string blockAfter(const std::string& text) {
   const std::string all = readme();
   const std::size_t from = all.find("```\n", all.find(text)) + 4;
@@ -27,7 +28,7 @@ std::string blockAfter(const std::string& text) {
   return all.substr(from, all.find("```", from) - from);
 }
 
-/// The words of a line as a shell takes them, up to a comment; of quotes it may have single ones.
+/// The words of a line as a shell splits them, up to a comment; single quotes are supported.
 std::vector<std::string> wordsOf(const std::string& line) {
   std::vector<std::string> words;
   bool isQuoted = false;
@@ -49,7 +50,7 @@ std::vector<std::string> wordsOf(const std::string& line) {
   return words;
 }
 
-/// Runs the lines "./run -- ..." of a block, one after the other, each of which has to do what it says.
+/// Runs the lines "./run -- ..." of a block, one after the other; each must succeed.
 void runAll(const TestHost& host, const std::string& block) {
   std::istringstream lines(block);
   int count = 0;

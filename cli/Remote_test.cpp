@@ -1,5 +1,6 @@
-// zorvactl --url as a process: against the server of this project, where it must say what it says without one, and
-// against servers that misbehave.
+// zorvactl --url as a process: with the server of this project, where it must print the same as without one, and with
+// servers that misbehave.
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
@@ -41,7 +42,7 @@ void makeWorld(const TestHost& host) {
   host.directory().write("data/ifcfg-eth0", kFile);
 }
 
-/// Without the hosts of paths, which a server may write where the providers do not, and the other way round.
+/// Without the hosts of paths, which a server may write where the providers do not, and vice versa.
 std::string withoutHosts(std::string text) {
   for (const auto& [pattern, replacement] :
        std::vector<std::pair<std::string, std::string>>{{R"(//[A-Za-z0-9.-]+/(?=root/))", ""},
@@ -221,7 +222,7 @@ TEST(RemoteChange, WritesTheSameAsOneWithoutAServer) {
   EXPECT_THAT(contentsOf(there.dataFile("ifcfg-eth0")), HasSubstr("DNSSERVERS=2001:db8::1 192.0.2.2 \n"));
 }
 
-TEST(RemoteChange, FailsWhereItCameToNothing) {
+TEST(RemoteChange, FailsIfNothingWasStored) {
   const TestHost host;
   const TestServer server(host);
   const Outcome outcome = host.run({"domain", "eth0", "lab.example.org", "--url", server.url()});
@@ -257,28 +258,28 @@ TEST_F(Remote, NeedsNoConfigurationOfTheAgentHere) {
 
 // --- servers that misbehave
 
-/// How "names" ends against a server that says this.
+/// How "names" ends with a server that sends this.
 Outcome against(const std::string& reply) {
   const ScriptedServer server({reply});
   return TestHost().run({"names", "ZORVA_DNSSettingData", "--url", server.url()});
 }
 
-TEST(RemoteFailure, TellsWhereNobodyListens) {
+TEST(RemoteFailure, ReportsThatNoServerListens) {
   const Outcome outcome = TestHost().run({"show", "--url", "http://127.0.0.1:1"});
   EXPECT_EQ(outcome.exitCode, 1);
   EXPECT_THAT(outcome.err, StartsWith("zorvactl: no answer from http://127.0.0.1:1: "));
 }
 
-TEST(RemoteFailure, TellsOfAUrlThatIsNone) {
+TEST(RemoteFailure, ReportsAWrongUrl) {
   const Outcome outcome = TestHost().run({"show", "--url", "localhost:5988"});
   EXPECT_EQ(outcome.exitCode, 2);
   EXPECT_THAT(outcome.err, HasSubstr("--url: it begins neither with http:// nor with https://"));
 }
 
-TEST(RemoteFailure, TellsOfHttpThatIsNoSuccess) {
+TEST(RemoteFailure, ReportsHttpErrors) {
   Outcome outcome = against(ScriptedServer::reply("", "401 Unauthorized"));
   EXPECT_EQ(outcome.exitCode, 1);
-  EXPECT_THAT(outcome.err, HasSubstr("answered HTTP 401: it wants another login"));
+  EXPECT_THAT(outcome.err, HasSubstr("answered HTTP 401: it requires another login"));
   outcome = against(ScriptedServer::reply("", "400 Bad Request", "CIMError: request-not-well-formed%20\x1B[2J\r\n"));
   EXPECT_EQ(outcome.exitCode, 1);
   EXPECT_THAT(outcome.err, HasSubstr("answered HTTP 400: request-not-well-formed \\x1B[2J\n"));
@@ -286,7 +287,7 @@ TEST(RemoteFailure, TellsOfHttpThatIsNoSuccess) {
   EXPECT_THAT(outcome.err, HasSubstr("answered HTTP 302\n")) << "a redirection is not followed";
 }
 
-TEST(RemoteFailure, TellsOfWhatIsNoCimXml) {
+TEST(RemoteFailure, ReportsATextThatIsNoCimXml) {
   for (const char* body : {"", "hello", "<html></html>", "<CIM><MESSAGE>"}) {
     const Outcome outcome = against(ScriptedServer::reply(body));
     EXPECT_EQ(outcome.exitCode, 1) << body;
@@ -294,7 +295,7 @@ TEST(RemoteFailure, TellsOfWhatIsNoCimXml) {
   }
 }
 
-TEST(RemoteFailure, TellsOfAnAnswerThatBreaksOff) {
+TEST(RemoteFailure, ReportsAnIncompleteAnswer) {
   Outcome outcome = against("HTTP/1.1 200 OK\r\nContent-Length: 1000\r\n\r\n<CIM>");
   EXPECT_EQ(outcome.exitCode, 1);
   EXPECT_THAT(outcome.err, HasSubstr("no answer from http://127.0.0.1:"));
@@ -326,7 +327,7 @@ TEST(RemoteTrailers, ACodeThatIsNoneIsAFailureAllTheSame) {
   }
 }
 
-TEST(RemoteTrailers, AGraphGoesOnAfterThem) {
+TEST(RemoteTrailers, AGraphContinuesAfterThem) {
   const auto has = [](const std::string& request, const char* text) { return request.find(text) != std::string::npos; };
   const ScriptedServer server([&](const std::string& request) -> std::optional<std::string> {
     const bool isEndpoint = has(request, "ZORVA_DNSProtocolEndPoint");
@@ -380,7 +381,7 @@ constexpr const char* kDiskNames =
     R"(<IRETURNVALUE><INSTANCENAME CLASSNAME="X_Disk"><KEYBINDING NAME="Number"><KEYVALUE VALUETYPE="numeric">7)"
     R"(</KEYVALUE></KEYBINDING></INSTANCENAME></IRETURNVALUE>)";
 
-TEST(RemoteClass, IsAskedForWhereItIsNotKnownHere) {
+TEST(RemoteClass, IsRequestedIfItIsNotKnownHere) {
   const ScriptedServer server(
       {ScriptedServer::cimReply(kDisk), ScriptedServer::cimReply(kDiskNames),
        ScriptedServer::cimReply(R"(<IRETURNVALUE><INSTANCE CLASSNAME="X_Disk"><PROPERTY NAME="State" TYPE="uint8">)"

@@ -5,7 +5,7 @@
 
 namespace zorva::schema {
 
-/// A MOF file of this folder, as the build put it into the program.
+/// A MOF file of this folder, embedded by the build.
 struct BuiltInMof {
   std::string_view name;  ///< "zorva.mof"
   std::string_view text;

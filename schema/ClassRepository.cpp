@@ -7,8 +7,8 @@ namespace zorva::schema {
 
 namespace {
 
-// Bounds that no schema in use comes near. They keep the work linear in what is given: a look-up among siblings goes
-// through all of them, and a subclass holds a copy of the qualifiers that it inherits.
+// Limits that no schema in use comes near. They keep the work linear in the size of the input: a look-up among siblings
+// tests all of them, and a subclass holds a copy of the qualifiers that it inherits.
 constexpr std::size_t kMostElements = 1000;   // properties of a class, with the inherited ones; likewise methods
 constexpr std::size_t kMostParameters = 250;  // of a method
 constexpr std::size_t kMostQualifiers = 250;  // of an element
@@ -19,7 +19,7 @@ struct Refusal {
   SchemaError error;
 };
 
-// An element in the words of an error, put together only when there is one.
+// An element in the words of an error; the text is only composed when there is an error.
 struct Element {
   std::string_view kind;
   std::string_view name;
@@ -75,7 +75,7 @@ Qualifiers ownOnly(const Qualifiers& qualifiers) {
   return own;
 }
 
-// Where in `elements` the one of that name is; elements.size() where there is none.
+// The index in `elements` of the one with that name; elements.size() if there is none.
 template <typename Element>
 std::size_t indexOf(const std::vector<const Element*>& elements, std::string_view name) {
   std::size_t i = 0;
@@ -97,7 +97,7 @@ class ClassBuilder {
       : repository_(repository), declaration_(declaration), class_(new Class) {}
 
   std::unique_ptr<Class> build();
-  /// What the built class holds of others: bytes of qualifiers and of tables.
+  /// The bytes of inherited qualifiers and of tables in the built class.
   std::size_t inheritedBytes() const noexcept { return inheritedBytes_; }
 
  private:
@@ -183,7 +183,7 @@ void ClassBuilder::addProperty(Property& declared) {
     refuse(property->place, on.text() + " is declared twice");
   }
   if (isReference && !class_->isAssociation_) {
-    refuse(property->place, on.text() + " stands in a class without the Association qualifier");
+    refuse(property->place, on.text() + " is in a class without the Association qualifier");
   }
   property->origin = class_.get();
   resolveQualifiers(property->qualifiers, isReference ? ScopeReference : ScopeProperty, on);
@@ -271,7 +271,7 @@ void ClassBuilder::addMethod(Method& declared) {
   class_->ownMethods_.push_back(std::move(method));
 }
 
-// Override names the property, alone or after "Class.". Without it a second declaration is a mistake, not an override.
+// Override names the property, alone or after "Class.". Without the qualifier a second declaration is an error.
 void ClassBuilder::checkOverrideQualifier(const Qualifiers& qualifiers, Element element, Place place,
                                           bool overrides) const {
   const Qualifier* qualifier = findQualifier(qualifiers, "Override");
@@ -303,7 +303,7 @@ void ClassBuilder::resolveQualifiers(Qualifiers& qualifiers, unsigned scope, Ele
     if (type == nullptr) refuse(qualifier.place, what() + " is not declared");
     if ((type->scope & scope) == 0)
       refuse(qualifier.place, what() + " does not belong there: its scope leaves that out");
-    if (findQualifier(qualifiers, name) != &qualifier) refuse(qualifier.place, what() + " stands twice");
+    if (findQualifier(qualifiers, name) != &qualifier) refuse(qualifier.place, what() + " is given twice");
     if (!qualifier.value) {
       qualifier.value = type->type == Type::Boolean && !type->isArray ? Value::of(true) : Value::null(type->isArray);
     }
@@ -317,7 +317,8 @@ void ClassBuilder::resolveQualifiers(Qualifiers& qualifiers, unsigned scope, Ele
   }
 }
 
-// Adds what is inherited and not stated anew; a DisableOverride qualifier may only be stated with the same value.
+// Adds the inherited ones that are not stated again; a DisableOverride qualifier may only be stated with the same
+// value.
 void ClassBuilder::mergeQualifiers(Qualifiers& own, const Qualifiers& inherited, Element on) const {
   for (const Qualifier& above : inherited) {
     if (!above.flavor.toSubclass) continue;

@@ -1,5 +1,11 @@
 #pragma once
 
+// The classes of a namespace with all inherited elements, and the queries that a broker or a server needs.
+//
+// Names are accepted in any case and returned in the schema's own spelling. A ClassRepository is first filled (add) by
+// one thread. From then on its const functions, and those of its classes, may be called by any number of threads. All
+// returned pointers are valid as long as the repository lives.
+
 #include <cstdint>
 #include <memory>
 #include <optional>
@@ -11,34 +17,28 @@
 #include "schema/Declarations.h"
 #include "util/Names.h"
 
-// The classes of a namespace with everything that they inherit, and the questions that a broker or a server asks of
-// them.
-//
-// Names are taken in any case and given back in the schema's own spelling. A ClassRepository is filled first (add) by
-// one thread; from then on its const functions, and those of its classes, may be called by any number of threads. All
-// pointers that it hands out stay good as long as the repository lives.
-
 namespace zorva::schema {
 
 class Class;
 
-/// A property as a class has it: own, overridden or inherited. Inherited ones are shared with the class that declares
-/// them: where `origin` is not the class at hand, the property and all its qualifiers are propagated, whatever the
-/// qualifiers' own marks say, which are those at `origin`.
+/// A property of a class: own, overridden or inherited. Inherited ones are shared with the class that declares them: if
+/// `origin` is another class, the property and all its qualifiers are propagated, independent of the qualifiers' own
+/// marks, which are those at `origin`.
 struct ClassProperty : Property {
-  const Class* origin = nullptr;     ///< the class at hand or the nearest above it that declares or overrides it
+  const Class* origin = nullptr;     ///< the class itself or the nearest superclass that declares or overrides it
   const Class* reference = nullptr;  ///< the class of a reference; null for other types
   bool isKey = false;
-  const ClassProperty* bequeathed = nullptr;  ///< what subclasses see, where Restricted qualifiers hide; null: this
+  const ClassProperty* bequeathed =
+      nullptr;  ///< the property that subclasses see, if it has Restricted qualifiers; null: this one
 };
 
-/// A method as a class has it, shared in the same way.
+/// A method of a class, shared in the same way.
 struct ClassMethod : Method {
   const Class* origin = nullptr;
   const ClassMethod* bequeathed = nullptr;
 };
 
-/// A class with all that it inherits (DSP0004 5.1.2). Immutable.
+/// A class with all its inherited elements (DSP0004 5.1.2). Immutable.
 class Class {
  public:
   Class(const Class&) = delete;
@@ -50,17 +50,17 @@ class Class {
   /// Null for a class without one.
   const Class* superclass() const noexcept { return superclass_; }
 
-  /// Its own qualifiers and those that it inherits (marked propagated); each has its value and flavor.
+  /// Its own qualifiers and the inherited ones (marked propagated); each has its value and flavor.
   const Qualifiers& qualifiers() const noexcept { return qualifiers_; }
 
-  /// Inherited ones first, in the order of their first declaration, root first; overridden ones in their old place.
+  /// Inherited ones first, in the order of their first declaration, root first; an overridden one keeps its place.
   const std::vector<const ClassProperty*>& properties() const noexcept { return properties_; }
   const std::vector<const ClassMethod*>& methods() const noexcept { return methods_; }
 
   /// The key properties, in the order of properties(). Empty for a class that has none.
   const std::vector<const ClassProperty*>& keys() const noexcept { return keys_; }
 
-  /// The reference properties, in the order of properties(). Empty for what is no association.
+  /// The reference properties, in the order of properties(). Empty if the class is no association.
   const std::vector<const ClassProperty*>& references() const noexcept { return references_; }
 
   /// Null where the class has no such property or method.
@@ -72,13 +72,13 @@ class Class {
 
   /// True for the class itself and every class below `ancestor`.
   bool isA(const Class& ancestor) const noexcept;
-  /// The same by name; false for a name that no class in the chain has.
+  /// The same by name; false if no class in the chain has that name.
   bool isA(std::string_view ancestor) const noexcept;
 
   /// The classes that name this one as their superclass, in the order in which they were added.
   const std::vector<const Class*>& subclasses() const noexcept { return subclasses_; }
 
-  /// What the class itself declares, without what it inherits: for writing it down (writeMof).
+  /// The class's own declarations, without inherited ones, for writeMof.
   ClassDeclaration declaration() const;
 
  private:
@@ -90,12 +90,12 @@ class Class {
   const Class* superclass_ = nullptr;
   Qualifiers qualifiers_;
   std::vector<std::unique_ptr<ClassProperty>> ownProperties_;
-  // Twins, without the Restricted qualifiers, of own elements that have such; other elements are shared as they are.
+  /// Copies, without the Restricted qualifiers, of own elements that have such; other elements are shared.
   std::vector<std::unique_ptr<ClassProperty>> bequeathedProperties_;
   std::vector<std::unique_ptr<ClassMethod>> ownMethods_;
   std::vector<std::unique_ptr<ClassMethod>> bequeathedMethods_;
   std::vector<const ClassProperty*> properties_;
-  std::vector<std::uint32_t> propertyHashes_;  // util::nameHash of properties_[i]->name: a look-up compares few names
+  std::vector<std::uint32_t> propertyHashes_;  ///< util::nameHash of properties_[i]->name: a look-up compares few names
   std::vector<const ClassMethod*> methods_;
   std::vector<const ClassProperty*> keys_;
   std::vector<const ClassProperty*> references_;
@@ -112,41 +112,41 @@ class ClassRepository {
   ClassRepository(const ClassRepository&) = delete;
   ClassRepository& operator=(const ClassRepository&) = delete;
 
-  /// Adds a qualifier type. Refused where one of that name is there. `file` goes into the error.
+  /// Adds a qualifier type. Refused if the name exists. `file` is used in the error.
   std::optional<SchemaError> add(QualifierType type, std::string_view file = {});
 
-  /// Adds a class and works out what it inherits. Everything that it names must be there already: its superclass, the
+  /// Adds a class and computes its inherited elements. Everything that it names must exist already: its superclass, the
   /// classes of its references and the types of its qualifiers (a class may refer to itself). Refused, with the
-  /// repository unchanged, are: a class that is there already; a missing superclass or class of a reference; a
-  /// qualifier without a type, with a value of another type, out of its scope, or twice on an element; an override that
-  /// changes type, arrayness or the value of a DisableOverride qualifier, that lacks the Override qualifier, or that
-  /// names nothing to override; a further key below a class with keys; a reference in what is no association; more than
-  /// 1,000 properties or methods, 250 qualifiers or parameters, or 100 classes in a chain.
+  /// repository unchanged, are: a class that exists already; a missing superclass or class of a reference; a qualifier
+  /// without a type, with a value of another type, out of its scope, or twice on an element; an override that changes
+  /// type, arrayness or the value of a DisableOverride qualifier, that lacks the Override qualifier, or that names
+  /// nothing to override; a further key below a class with keys; a reference in a class that is no association; more
+  /// than 1,000 properties or methods, 250 qualifiers or parameters, or 100 classes in a chain.
   std::optional<SchemaError> add(ClassDeclaration declaration, std::string_view file = {});
 
-  /// Null where there is no such class.
+  /// Null if there is no such class.
   const Class* find(std::string_view name) const noexcept;
 
-  /// All classes in the order in which they were added; each stands after its superclass.
+  /// All classes in the order in which they were added; each comes after its superclass.
   const std::vector<const Class*>& classes() const noexcept { return order_; }
 
-  /// The classes below `ancestor`: direct ones, or with `deep` all, each before those below it. Without `ancestor`: the
-  /// classes that have no superclass, or with `deep` all classes.
+  /// The subclasses of `ancestor`: direct ones, or with `deep` all, each before its own subclasses. Without `ancestor`:
+  /// the classes that have no superclass, or with `deep` all classes.
   std::vector<const Class*> subclasses(const Class* ancestor, bool deep) const;
 
-  /// The associations that are not abstract and have a reference that an object of class `source` can stand at.
-  /// `ancestor`: only it and the associations below it; null: all. In the order of classes(). An abstract class stands
-  /// for those below it, so this is the list of concrete names that an omitted or a superclass AssocClass means.
+  /// The associations that are not abstract and have a reference that can refer to an object of class `source`.
+  /// `ancestor`: only it and its subclasses; null: all. In the order of classes(). An omitted AssocClass, or a
+  /// superclass, means this list of concrete classes.
   std::vector<const Class*> associationsOf(const Class& source, const Class* ancestor = nullptr) const;
 
-  /// Null where there is no such qualifier type.
+  /// Null if there is no such qualifier type.
   const QualifierType* findQualifierType(std::string_view name) const noexcept;
   /// All qualifier types, in the order in which they were added.
   const std::vector<const QualifierType*>& qualifierTypes() const noexcept { return qualifierOrder_; }
 
  private:
   std::unordered_map<std::string_view, std::unique_ptr<Class>, util::NameHash, util::NameEqual>
-      classes_;  // keys: the classes' names
+      classes_;  ///< keys: the classes' names
   std::unordered_map<std::string_view, std::unique_ptr<QualifierType>, util::NameHash, util::NameEqual> qualifierTypes_;
   std::vector<const Class*> order_;
   std::vector<const QualifierType*> qualifierOrder_;

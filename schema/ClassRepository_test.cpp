@@ -196,7 +196,7 @@ TEST_F(ClassRepositoryTest, DeclarationGivesBackWhatTheClassItselfSays) {
             "};\n");
 }
 
-// Each row: what is added to kNet, and why that is refused.
+// Each row: an addition to kNet, and why it is refused.
 TEST_F(ClassRepositoryTest, RefusesWhatDoesNotHoldTogether) {
   load(kNet);
   const std::size_t before = repository_.classes().size();
@@ -207,7 +207,7 @@ TEST_F(ClassRepositoryTest, RefusesWhatDoesNotHoldTogether) {
       {"class X : X { };", "t.mof:1:7: superclass 'X' of class 'X' is not declared"},
       {"[Association] class X { Y REF A; E REF B; };", "t.mof:1:31: class 'Y' of reference 'A' is not declared"},
       {"class X { uint8 F(Y REF P); };", "t.mof:1:25: class 'Y' of parameter 'P' of method 'F' is not declared"},
-      {"class X { E REF A; };", "t.mof:1:17: reference 'A' stands in a class without the Association qualifier"},
+      {"class X { E REF A; };", "t.mof:1:17: reference 'A' is in a class without the Association qualifier"},
       {"[Association] class X { E REF A; };", "t.mof:1:21: association 'X' has 1 references; it needs two at least"},
       {"class X { string A; uint8 a; };", "t.mof:1:27: property 'a' is declared twice"},
       {"class X { uint8 F(); uint8 f(); };", "t.mof:1:28: method 'f' is declared twice"},
@@ -237,14 +237,15 @@ TEST_F(ClassRepositoryTest, RefusesWhatDoesNotHoldTogether) {
        "t.mof:1:12: qualifier 'Association' on property 'A' does not belong there: its scope leaves that out"},
       {"class X { uint8 F([Key] uint8 P); };",
        "t.mof:1:20: qualifier 'Key' on parameter 'P' of method 'F' does not belong there: its scope leaves that out"},
-      {"class X { [MaxLen(1), maxlen(2)] string A; };", "t.mof:1:23: qualifier 'maxlen' on property 'A' stands twice"},
+      {"class X { [MaxLen(1), maxlen(2)] string A; };",
+       "t.mof:1:23: qualifier 'maxlen' on property 'A' is given twice"},
       {"class X { [MaxLen(\"5\")] string A; };",
        "t.mof:1:12: qualifier 'MaxLen' on property 'A': a text is no value of type uint32"},
       {"class X { [MaxLen{5}] string A; };",
-       "t.mof:1:12: qualifier 'MaxLen' on property 'A': an array stands where a single uint32 belongs"},
+       "t.mof:1:12: qualifier 'MaxLen' on property 'A': an array is given where a single uint32 belongs"},
       {"class X { [MaxLen(4294967296)] string A; };",
        "t.mof:1:12: qualifier 'MaxLen' on property 'A': 4294967296 does not fit in uint32"},
-      {"instance of Host { Id = \"a\"; };", "t.mof:1:13: an instance of 'Host' stands among the classes"},
+      {"instance of Host { Id = \"a\"; };", "t.mof:1:13: an instance of 'Host' is among the classes"},
   };
   for (const auto& [text, error] : rows) EXPECT_EQ(errorOf(text), error) << text;
   EXPECT_EQ(repository_.classes().size(), before);
@@ -302,7 +303,7 @@ TEST_F(ClassRepositoryTest, BoundsTheDepthOfAChain) {
   EXPECT_THAT(errorOf(chain), HasSubstr("class 'C101' has 101 superclasses; at most 100 can be"));
 }
 
-// Without a bound, a long description and many subclasses would take a thousand times the text's own size.
+// Without a limit, a long description and many subclasses would take a thousand times the text's own size.
 TEST_F(ClassRepositoryTest, BoundsWhatSubclassesInherit) {
   load("[Description(\"" + std::string(1U << 20U, 'x') + "\")] class Base { };");
   std::string subclasses;

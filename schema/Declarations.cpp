@@ -145,8 +145,8 @@ std::optional<std::string> fitValue(Value& value, Type type, bool isArray) {
     return std::nullopt;
   }
   if (value.isArray != isArray) {
-    return isArray ? "a single value stands where an array of " + std::string(typeName(type)) + " belongs"
-                   : "an array stands where a single " + std::string(typeName(type)) + " belongs";
+    return isArray ? "a single value is given where an array of " + std::string(typeName(type)) + " belongs"
+                   : "an array is given where a single " + std::string(typeName(type)) + " belongs";
   }
   if (!isArray && !fitScalar(value.scalar, type)) return misfit(value.scalar, type);
   for (Scalar& element : value.elements) {

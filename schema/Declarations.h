@@ -1,5 +1,10 @@
 #pragma once
 
+// The declarations of a MOF text, as plain records (DSP0004 2.x). A ClassDeclaration has only the declarations of its
+// own text; the class with all inherited elements is schema::Class in ClassRepository.h.
+//
+// All text is UTF-8. Records are values: no sharing, no locking; a const record may be read by any number of threads.
+
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -8,14 +13,9 @@
 #include <variant>
 #include <vector>
 
-// What a MOF text declares, as plain records (DSP0004 2.x). A ClassDeclaration holds only what its own text says; the
-// class with all that it inherits is schema::Class in ClassRepository.h.
-//
-// All text is UTF-8. Records are values: no sharing, no locking; a const record may be read by any number of threads.
-
 namespace zorva::schema {
 
-/// Where a declaration begins: line and column from 1, the column counted in bytes. Line 0: it came from no text.
+/// The beginning of a declaration: line and column from 1, the column counted in bytes. Line 0: not from a text.
 struct Place {
   std::uint32_t line = 0;
   std::uint32_t column = 0;
@@ -43,7 +43,7 @@ enum class Type : std::uint8_t {
 /// The MOF keyword of a type ("uint16"); "ref" for a reference.
 std::string_view typeName(Type type) noexcept;
 
-/// The type that a MOF keyword stands for, in any case; "ref" is none here. Nothing where there is no such type.
+/// The type of a MOF keyword, in any case; "ref" is none here. Nothing if there is no such type.
 std::optional<Type> typeFromName(std::string_view name) noexcept;
 
 bool isUnsigned(Type type) noexcept;
@@ -69,12 +69,12 @@ struct Value {
   bool operator==(const Value&) const = default;
 };
 
-/// Makes `value` a value of the type: a whole number becomes a signed one or a real where the type wants that, a text
-/// is tested where the type is datetime. Null fits every type. Gives a message, in words like "300 does not fit in
-/// uint8", where it cannot be one; then `value` is as it was or partly converted.
+/// Converts `value` to a value of the type: a whole number becomes a signed one or a real if the type requires that, a
+/// text is checked if the type is datetime. Null fits every type. Returns a message, such as "300 does not fit in
+/// uint8", if that is not possible; then `value` is unchanged or partly converted.
 std::optional<std::string> fitValue(Value& value, Type type, bool isArray);
 
-/// True for a date-time or an interval of DSP0004 5.2.4: 25 characters, asterisks for what is not told.
+/// True for a date-time or an interval of DSP0004 5.2.4: 25 characters, asterisks for unknown parts.
 bool isDateTime(std::string_view text) noexcept;
 
 /// True for the boolean true; false for all else, null included.
@@ -83,7 +83,7 @@ bool isTrue(const Value& value) noexcept;
 /// The text of a string value; empty for all else.
 std::string_view textOf(const Value& value) noexcept;
 
-/// What a qualifier may stand on: one bit each.
+/// The elements that may have a qualifier: one bit each.
 enum Scope : std::uint16_t {
   ScopeClass = 1,
   ScopeAssociation = 2,
@@ -95,7 +95,7 @@ enum Scope : std::uint16_t {
   ScopeAny = 127,
 };
 
-/// How a qualifier travels to subclasses (DSP0004 5.1.2.10.3).
+/// How a qualifier is inherited by subclasses (DSP0004 5.1.2.10.3).
 struct Flavor {
   bool toSubclass = true;   ///< false: Restricted
   bool overridable = true;  ///< false: DisableOverride
@@ -116,14 +116,14 @@ struct QualifierType {
   Place place;
 };
 
-/// The flavors that stand on a qualifier itself (`[Key : DisableOverride]`); the others come from its type.
+/// The flavors that are written on a qualifier itself (`[Key : DisableOverride]`); the others come from its type.
 struct StatedFlavor {
   std::optional<bool> toSubclass;
   std::optional<bool> overridable;
   std::optional<bool> translatable;
 };
 
-/// A qualifier on an element. As read, `value` is absent where the text gives none (`[Key]`) and `flavor` says nothing;
+/// A qualifier on an element. As read, `value` is absent if the text gives none (`[Key]`) and `flavor` has no meaning;
 /// a ClassRepository fills both from the qualifier's type.
 struct Qualifier {
   std::string name;
@@ -139,7 +139,7 @@ using Qualifiers = std::vector<Qualifier>;
 /// The qualifier of that name, or null. The pointer is into `qualifiers`.
 const Qualifier* findQualifier(const Qualifiers& qualifiers, std::string_view name) noexcept;
 
-/// True where the qualifier is there and either has no value or is true: `[Key]`, `[Key(true)]`.
+/// True if the qualifier exists and either has no value or is true: `[Key]`, `[Key(true)]`.
 bool hasQualifier(const Qualifiers& qualifiers, std::string_view name) noexcept;
 
 /// A property or, with Type::Reference, a reference of an association.
@@ -150,7 +150,7 @@ struct Property {
   std::optional<std::uint32_t> arraySize;  ///< of an array of fixed size
   std::string name;
   std::string referenceClass;  ///< the class named before REF; empty for other types
-  Value defaultValue;          ///< null where there is none
+  Value defaultValue;          ///< null if there is none
   Place place;
 };
 
@@ -197,12 +197,12 @@ struct InstanceDeclaration {
   Place place;
 };
 
-/// Why a text or a class was refused, and where.
+/// Why a text or a class was refused, and the place.
 struct SchemaError {
-  std::string file;  ///< as it was given to the reader; empty: no text
+  std::string file;  ///< the name that the reader got; empty: no text
   std::uint32_t line = 0;
   std::uint32_t column = 0;
-  std::string message;  ///< what is wrong, with what was expected and what was found
+  std::string message;  ///< the error, with the expected and the actual text
 
   /// "file:line:column: message"; the parts that are not known are left out.
   std::string text() const;

@@ -62,11 +62,11 @@ TEST(FitValue, LetsNullPassAsEveryType) {
   EXPECT_TRUE(value.isArray);
 }
 
-TEST(FitValue, WantsArraysWhereArraysBelong) {
+TEST(FitValue, RequiresArraysWhereArraysBelong) {
   Value one = Value::of(std::uint64_t{1});
-  EXPECT_EQ(fitValue(one, Type::Uint8, true), "a single value stands where an array of uint8 belongs");
+  EXPECT_EQ(fitValue(one, Type::Uint8, true), "a single value is given where an array of uint8 belongs");
   Value many = Value::array({std::uint64_t{1}});
-  EXPECT_EQ(fitValue(many, Type::Uint8, false), "an array stands where a single uint8 belongs");
+  EXPECT_EQ(fitValue(many, Type::Uint8, false), "an array is given where a single uint8 belongs");
   Value mixed = Value::array({std::uint64_t{1}, std::string("x"), std::monostate()});
   EXPECT_EQ(fitValue(mixed, Type::Uint8, true), "a text is no value of type uint8");
   Value good = Value::array({std::uint64_t{1}, std::monostate()});

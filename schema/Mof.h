@@ -1,5 +1,11 @@
 #pragma once
 
+// MOF texts (DSP0004 2.x, Annex A): reading and writing.
+//
+// The reader accepts any bytes: a text that is no MOF ends in an error that names file, line, column, the expected and
+// the actual text. Time and memory grow with the text only. No function here keeps state; each may be called on any
+// thread.
+
 #include <cstddef>
 #include <functional>
 #include <optional>
@@ -9,16 +15,10 @@
 #include "schema/ClassRepository.h"
 #include "schema/Declarations.h"
 
-// MOF texts (DSP0004 2.x, Annex A): reading and writing.
-//
-// The reader takes any bytes: what is no MOF ends in an error that names file, line, column, what was expected and what
-// was found. Time and memory grow with the text alone. No function here keeps state; each may be called on any thread.
-
 namespace zorva::schema {
 
-/// What takes the declarations of a text, each as soon as it is read, in the text's order. A function that gives back a
-/// message refuses the declaration and ends the reading; the reader adds file, line and column unless the error has
-/// them.
+/// Takes the declarations of a text, each as soon as it is read, in the text's order. A function that returns a message
+/// refuses the declaration and ends the reading; the reader adds file, line and column unless the error has them.
 class MofSink {
  public:
   virtual ~MofSink() = default;
@@ -40,35 +40,34 @@ class RepositorySink : public MofSink {
   ClassRepository& repository_;
 };
 
-/// What a `#pragma include` brought: the name under which errors speak of it, and its text; or why there is none.
+/// The result of a `#pragma include`: its name in errors and its text, or why it cannot be read.
 struct MofInclude {
   std::string file;
   std::string text;
-  std::string error;  ///< not empty: the file cannot be had
+  std::string error;  ///< not empty: the file cannot be read
 };
 
-/// Finds an included text: `name` as the pragma has it, `from` the file in which it stands.
+/// Finds an included text: `name` is the pragma's text, `from` the file that contains it.
 using MofIncluder = std::function<MofInclude(std::string_view name, std::string_view from)>;
 
-/// Bounds on one reading, its included texts counted in.
+/// Limits of one reading, including its included texts.
 struct MofLimits {
   std::size_t bytes = 16U << 20U;  ///< of all texts together
   unsigned includeDepth = 16;
   unsigned includedFiles = 1000;
 };
 
-/// Reads `text` and hands what it declares to `sink`. `file` is the name that errors carry. Without `includer` an
-/// include is an error. Gives the first error, of the text or of the sink; what was handed to the sink before it stays
-/// there.
+/// Reads `text` and passes its declarations to `sink`. `file` is the name in errors. Without `includer` an include is
+/// an error. Returns the first error, of the text or of the sink; declarations that the sink got before stay there.
 std::optional<SchemaError> parseMof(std::string_view text, std::string_view file, MofSink& sink,
                                     const MofIncluder& includer = {}, const MofLimits& limits = {});
 
-/// Reads the file at `path`; its includes are resolved relative to the file in which they stand. Only regular files are
-/// read, so nothing blocks.
+/// Reads the file at `path`; its includes are relative to the file that contains them. Only regular files are read, so
+/// nothing blocks.
 std::optional<SchemaError> parseMofFile(const std::string& path, MofSink& sink, const MofLimits& limits = {});
 
-/// A declaration as MOF, ended by a line feed. Long texts are split at blanks so that lines stay within 100 columns
-/// where that is possible. What writeMof writes, parseMof reads back to the same declaration.
+/// A declaration as MOF, ended by a line feed. Long texts are split at blanks so that lines stay within 100 columns if
+/// possible. parseMof reads the result back to the same declaration.
 std::string writeMof(const QualifierType& type);
 std::string writeMof(const ClassDeclaration& declaration);
 std::string writeMof(const InstanceDeclaration& instance);

@@ -29,8 +29,8 @@ std::string byteName(char c) {
   return std::string("byte 0x") + digits[byte >> 4U] + digits[byte & 15U];
 }
 
-// The whole number that a lexeme without sign spells: hexadecimal, binary, octal or decimal. `ok` false: it spells
-// none; `large`: it does not fit in 64 bits.
+// The whole number of a lexeme without sign: hexadecimal, binary, octal or decimal. `ok` false: it is no number;
+// `large`: it does not fit in 64 bits.
 struct WholeNumber {
   std::uint64_t value = 0;
   bool ok = false;
@@ -56,7 +56,7 @@ WholeNumber wholeNumber(std::string_view digits) {
   return number;
 }
 
-// The number with its sign; nothing where a negative one is below what 64 bits hold.
+// The number with its sign; nothing if a negative one does not fit in 64 bits.
 std::optional<Scalar> withSign(std::uint64_t value, bool negative) {
   if (!negative) return Scalar(value);
   constexpr std::uint64_t lowest = std::uint64_t{1} << 63U;
@@ -64,8 +64,8 @@ std::optional<Scalar> withSign(std::uint64_t value, bool negative) {
   return Scalar(value == lowest ? std::numeric_limits<std::int64_t>::min() : -static_cast<std::int64_t>(value));
 }
 
-// [digits] "." digits [exponent], without sign. from_chars takes more (a point at the end, "inf"), so the shape is
-// tested first.
+// [digits] "." digits [exponent], without sign. from_chars accepts more (a point at the end, "inf"), so the syntax is
+// checked first.
 bool looksReal(std::string_view text) noexcept {
   const std::size_t point = text.find('.');
   if (point == std::string_view::npos || point + 1 >= text.size() || !isDigit(text[point + 1])) return false;
@@ -211,7 +211,7 @@ void MofLexer::readString() {
   token_.string.clear();
   ++at_;
   for (;;) {
-    // The plain characters of a piece go over in one go.
+    // The plain characters of a piece are copied at once.
     const std::size_t plain = at_;
     while (at_ < text_.size() && text_[at_] >= ' ' && text_[at_] < 127 && text_[at_] != '"' && text_[at_] != '\\')
       ++at_;

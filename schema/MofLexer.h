@@ -1,12 +1,12 @@
 #pragma once
 
+// The tokens of a MOF text (DSP0004 Annex A). Private to the reader.
+
 #include <cstdint>
 #include <string>
 #include <string_view>
 
 #include "schema/Declarations.h"
-
-// The words of a MOF text (DSP0004 Annex A). Private to the reader.
 
 namespace zorva::schema {
 
@@ -25,12 +25,12 @@ enum class TokenKind : std::uint8_t {
 struct Token {
   TokenKind kind = TokenKind::End;
   Place place;
-  std::string_view lexeme;  ///< as it stands in the text
+  std::string_view lexeme;  ///< exactly as in the text
   std::string string;       ///< of a String: its characters, escapes resolved
   Scalar number;            ///< of an Integer, a Real or a Character
 
   bool is(char mark) const noexcept { return kind == TokenKind::Mark && lexeme[0] == mark; }
-  /// The word in any case; MOF's keywords are words like any other where no keyword can stand.
+  /// The word in any case; a MOF keyword is a word like any other where no keyword is possible.
   bool isWord(std::string_view word) const noexcept;
   /// For "found ..." in an error: short and printable.
   std::string describe() const;
@@ -41,13 +41,13 @@ struct MofFailure {
   SchemaError error;
 };
 
-/// Cuts a text into tokens, one at a time. Throws MofFailure at bytes that begin no token or break one off.
+/// Splits a text into tokens, one at a time. Throws MofFailure at bytes that begin no token or break one off.
 class MofLexer {
  public:
   /// Both views must outlive the lexer.
   MofLexer(std::string_view text, std::string_view file);
 
-  /// The token at hand; End at the end of the text, again and again.
+  /// The current token; End at the end of the text, also if called again.
   const Token& token() const noexcept { return token_; }
   Token& token() noexcept { return token_; }
 
@@ -66,7 +66,7 @@ class MofLexer {
   void readString();
   void readCharacter();
   void readNumber();
-  /// Appends one character of a string or of a character literal, an escape resolved, and steps over it.
+  /// Appends one character of a string or of a character literal, with escapes resolved, and moves past it.
   void readCharacterInto(std::string& out, char quote);
   void readEscapeInto(std::string& out);
   std::size_t utf8LengthHere() const;

@@ -12,7 +12,7 @@ namespace zorva::schema {
 
 namespace {
 
-// Words for an error, put together only when there is one: "after property" and the property's name.
+// Words for an error, such as "after property" and the property's name; only composed when there is an error.
 struct What {
   std::string_view words;
   std::string_view name;
@@ -24,7 +24,7 @@ struct What {
   }
 };
 
-// What is used up in one reading, over all included texts.
+// The resources used by one reading, over all included texts.
 struct Budget {
   const MofLimits& limits;
   std::size_t bytes = 0;
@@ -32,8 +32,8 @@ struct Budget {
   unsigned files = 0;
 };
 
-// Reads one text; an included text gets a parser of its own. The grammar has no nesting but braces around plain values,
-// so nothing but includes recurses, and those have their bound.
+// Reads one text; an included text gets its own parser. The grammar has no nesting except braces around plain values,
+// so only includes recurse, and their depth is limited.
 class MofParser {
  public:
   MofParser(std::string_view text, std::string_view file, MofSink& sink, const MofIncluder& includer, Budget& budget)
@@ -63,7 +63,7 @@ class MofParser {
   Type parseType(std::string& referenceClass, What what);
   // "[]" or "[12]" after a name.
   bool parseArrayMark(std::optional<std::uint32_t>& size);
-  // "= value", tested against the type.
+  // "= value", checked against the type.
   Value parseDefault(Type type, bool isArray, What what);
 
   const Token& token() const noexcept { return lexer_.token(); }
@@ -112,7 +112,7 @@ void MofParser::parse() {
   }
 }
 
-// #pragma name ("text"). Of all directives only include changes what is read; the others are passed over.
+// #pragma name ("text"). Only the directive include has an effect; the others are skipped.
 void MofParser::parsePragma() {
   lexer_.advance();
   const Place at = place();
@@ -480,7 +480,7 @@ std::optional<SchemaError> RepositorySink::classDeclaration(ClassDeclaration dec
 
 std::optional<SchemaError> RepositorySink::instance(InstanceDeclaration instance, std::string_view file) {
   return SchemaError{std::string(file), instance.place.line, instance.place.column,
-                     "an instance of '" + instance.className + "' stands among the classes"};
+                     "an instance of '" + instance.className + "' is among the classes"};
 }
 
 std::optional<SchemaError> parseMof(std::string_view text, std::string_view file, MofSink& sink,

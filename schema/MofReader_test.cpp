@@ -16,7 +16,7 @@ namespace {
 
 using ::testing::HasSubstr;
 
-// Keeps what a text declares.
+// Keeps the declarations of a text.
 class Collector : public MofSink {
  public:
   std::optional<SchemaError> qualifierType(QualifierType type, std::string_view) override {
@@ -208,7 +208,7 @@ TEST(MofReader, ReadsCharacters) {
   EXPECT_EQ(valueError("'\xF0\x9F\x98\x80'"), "t.mof:2:5: expected a character that 16 bits can hold");
 }
 
-// Each row: a text, and the one error that tells a person what to do about it.
+// Each row: a text, and the error that says what a person must change.
 TEST(MofReader, SaysWhatWasExpectedAndWhatWasFound) {
   const std::pair<const char*, const char*> rows[] = {
       {"klass X {};", "t.mof:1:1: expected 'class', 'instance', 'qualifier', '[' or '#pragma', found 'klass'"},
@@ -228,7 +228,8 @@ TEST(MofReader, SaysWhatWasExpectedAndWhatWasFound) {
       {"class X { uint8 N = 300; };",
        "t.mof:1:21: expected a default value of property 'N' of type uint8: 300 does not fit in uint8"},
       {"class X { uint8 N[] = 3; };",
-       "t.mof:1:23: expected a default value of property 'N' of type uint8[]: a single value stands where an array of "
+       "t.mof:1:23: expected a default value of property 'N' of type uint8[]: a single value is given where an array "
+       "of "
        "uint8 belongs"},
       {"class X { datetime T = \"now\"; };",
        "t.mof:1:24: expected a default value of property 'T' of type datetime: \"now\" is no datetime"},
@@ -289,7 +290,7 @@ TEST(MofReader, ShortensWhatWasFoundWithoutBreakingACharacter) {
   EXPECT_THAT(error, HasSubstr("\xC3\xA4...'"));
 }
 
-TEST(MofReader, HandsOutWhatComesBeforeTheError) {
+TEST(MofReader, DeliversTheDeclarationsBeforeTheError) {
   Collector collector;
   EXPECT_TRUE(parseMof("class A {}; class B {}; class", "t.mof", collector).has_value());
   EXPECT_EQ(collector.classes.size(), 2U);
@@ -328,7 +329,7 @@ TEST(MofInclude, NamesTheIncludedFileInItsErrors) {
             "b:2:7: expected the name of a class, found '{'");
 }
 
-TEST(MofInclude, IsAnErrorWhereTheTextCannotBeHad) {
+TEST(MofInclude, IsAnErrorIfTheTextCannotBeRead) {
   Collector collector;
   EXPECT_EQ(readTexts({{"top", "\n #pragma include (\"b\")"}}, collector)->text(),
             "top:2:10: cannot include \"b\": there is no such text");
@@ -340,7 +341,7 @@ TEST(MofInclude, IsBoundedInDepthNumberAndSize) {
   Collector collector;
   EXPECT_EQ(readTexts({{"top", "#pragma include (\"top\")"}}, collector)->message,
             "includes are nested deeper than 16 files");
-  // Doubles at each level: two to the sixteenth files without a bound on their number.
+  // Doubles at each level: 65,536 files if their number were not limited.
   EXPECT_EQ(readTexts({{"top", "#pragma include (\"a\")"},
                        {"a", "#pragma include (\"b\")\n#pragma include (\"b\")"},
                        {"b", "#pragma include (\"c\")\n#pragma include (\"c\")"},
@@ -396,7 +397,7 @@ TEST_F(MofFile, ThatIsTooLongIsAnError) {
             path + ": the text, with what it includes, is longer than the 100000 bytes allowed");
 }
 
-// Whatever the bytes are, the reader ends, and an error points into the text.
+// For any bytes the reader ends, and an error points into the text.
 void readAnything(std::string_view text) {
   ClassRepository repository;
   RepositorySink sink(repository);

@@ -24,14 +24,14 @@ void appendEscaped(std::string& out, std::string_view character) {
     out.append(character);
     return;
   }
-  // Four digits, so that a hexadecimal digit that follows is not taken into the escape.
+  // Four digits, so that a hexadecimal digit that follows is not read as part of the escape.
   constexpr std::string_view digits = "0123456789ABCDEF";
   out.append("\\x00");
   out.push_back(digits[byte >> 4U]);
   out.push_back(digits[byte & 15U]);
 }
 
-// The text with its escapes, without quotes. Bytes that are no UTF-8 become U+FFFD: MOF cannot carry them.
+// The text with its escapes, without quotes. Bytes that are not UTF-8 become U+FFFD: MOF cannot express them.
 std::string escaped(std::string_view text) {
   std::string out;
   out.reserve(text.size());
@@ -47,8 +47,8 @@ std::string escaped(std::string_view text) {
   return out;
 }
 
-// Where to cut an escaped text so that the piece has at most `width` bytes: after the last blank that allows it, else
-// within a word, but never within an escape or a character.
+// Where to cut an escaped text so that the piece has at most `width` bytes: after the last possible blank, else within
+// a word, but never within an escape or a character.
 std::size_t cutAt(std::string_view text, std::size_t width) {
   if (text.size() <= width) return text.size();
   if (const std::size_t blank = text.rfind(' ', width - 1); blank != std::string_view::npos) return blank + 1;
@@ -60,7 +60,7 @@ std::size_t cutAt(std::string_view text, std::size_t width) {
   return cut;
 }
 
-// A text in quotes; one that is too long for its line goes on in further lines at `indent`.
+// A text in quotes; one that is too long for its line continues in further lines at `indent`.
 std::string quoted(std::string_view text, std::size_t indent) {
   const std::string all = escaped(text);
   std::string_view rest = all;
@@ -128,7 +128,7 @@ std::string valueText(const Value& value, std::size_t indent) {
 
 std::string qualifierText(const Qualifier& qualifier, std::size_t indent) {
   std::string out = qualifier.name;
-  // [Key] says the same as [Key(true)].
+  // [Key] means the same as [Key(true)].
   if (qualifier.value && !(isTrue(*qualifier.value))) {
     const Value& value = *qualifier.value;
     if (value.isArray && !value.isNull) {

@@ -9,7 +9,7 @@ namespace {
 
 using ::testing::HasSubstr;
 
-// Writes what it is handed; reading that text again must write the same.
+// Writes the declarations that it gets; reading that text again must write the same.
 class Rewriter : public MofSink {
  public:
   std::optional<SchemaError> qualifierType(QualifierType type, std::string_view) override {
@@ -36,7 +36,7 @@ std::string rewritten(std::string_view text) {
   return rewriter.text;
 }
 
-// The value after it was written and read.
+// The value after writing and reading.
 Value there(const Value& value) {
   InstanceDeclaration one;
   one.className = "X";

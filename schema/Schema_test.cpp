@@ -150,7 +150,7 @@ TEST_F(ZorvaClasses, AssociationsHaveTheirTwoEnds) {
   }
 }
 
-// What the providers set: a property that the class lacks would be lost on its way to the client.
+// The properties that the providers set: the client would never get a property that the class lacks.
 TEST_F(ZorvaClasses, DeclareWhatTheProvidersSet) {
   const struct {
     const char *name, *type;

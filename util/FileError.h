@@ -1,4 +1,4 @@
-// How a failure of a system call on a file is thrown.
+// Throws the failure of a system call on a file.
 #pragma once
 
 #include <cerrno>

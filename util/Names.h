@@ -21,7 +21,7 @@ constexpr bool sameName(std::string_view a, std::string_view b) noexcept {
   return true;
 }
 
-// A hash under which two spellings of one name are equal (FNV-1a over the small letters).
+// A hash that is equal for two spellings of one name (FNV-1a over the small letters).
 constexpr std::uint32_t nameHash(std::string_view name) noexcept {
   std::uint32_t hash = 2166136261U;
   for (const char c : name) hash = (hash ^ static_cast<unsigned char>(lowerAscii(c))) * 16777619U;

@@ -20,14 +20,14 @@ constexpr std::size_t kFirstRoom = 4096;
 
 FileText readFile(const std::string& path, std::size_t limit) {
   FileText result;
-  // A path with a NUL in it would be opened up to there, as another file.
+  // With a NUL in it, the path would be cut there and name another file.
   if (path.find('\0') != std::string::npos) return {{}, false, ENOENT};
   const FileDescriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
   struct stat status {};
   if (!file || ::fstat(file.get(), &status) != 0) return {{}, false, errno};
   if (!S_ISREG(status.st_mode)) return {{}, false, EINVAL};
 
-  // The size that fstat tells is a guess only: the files of /proc and /sys tell none.
+  // The size from fstat is only a guess: for the files of /proc and /sys it is 0.
   const auto told = static_cast<std::size_t>(std::max<off_t>(status.st_size, 0));
   std::size_t used = 0;
   std::size_t room = std::min(limit, std::max(told, kFirstRoom)) + 1;

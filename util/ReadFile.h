@@ -1,4 +1,4 @@
-// Reads a small regular file whole.
+// Reads a small regular file.
 #pragma once
 
 #include <cstddef>
@@ -7,20 +7,20 @@
 namespace zorva::util {
 
 struct FileText {
-  std::string text;        // what was read, at most the limit
-  bool truncated = false;  // there was more
-  int error = 0;           // errno of what failed, 0 where nothing did; EINVAL for what is not a regular file
+  std::string text;        // the content, at most the limit
+  bool truncated = false;  // the file is longer
+  int error = 0;           // errno of the failure, 0 if there was none; EINVAL if it is not a regular file
 };
 
-// Reads a file up to limit bytes. What is not a regular file (symbolic links are followed) is not read, and neither
-// blocks nor is waited for. Throws std::bad_alloc alone.
+// Reads a file up to limit bytes. Symbolic links are followed. A file that is not regular is not read, so this never
+// blocks. Throws only std::bad_alloc.
 FileText readFile(const std::string& path, std::size_t limit);
 
-// Whether an error number of FileText tells of the moment and not of the file: no descriptor or memory was left, the
-// disk failed. What is read again later may be there, and nothing reports that it is.
+// Whether an error number of FileText is temporary: no descriptor or memory was left, or the disk failed. A later read
+// may succeed, and no event reports that.
 bool mayPass(int error);
 
-// What an error number of FileText means, in words.
+// The text of an error number of FileText.
 std::string fileErrorText(int error);
 
 }  // namespace zorva::util

@@ -19,7 +19,7 @@ void writeAndSync(const FileDescriptor& file, std::string_view text, const std::
   if (::fsync(file.get()) != 0) throwFileError(path, "cannot be synced");
 }
 
-// Removes the temporary file where the way is left early.
+// Removes the temporary file if the function is left early.
 class TemporaryFile {
  public:
   explicit TemporaryFile(std::string path) : path_(std::move(path)) {}
@@ -36,7 +36,7 @@ class TemporaryFile {
   std::string path_;
 };
 
-// The owner first: a change of it takes rights away.
+// The owner first: changing it removes rights.
 void giveRights(const FileDescriptor& file, const struct stat& like) {
   (void)!::fchown(file.get(), like.st_uid, like.st_gid);
   ::fchmod(file.get(), like.st_mode & 0777U);

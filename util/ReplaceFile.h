@@ -1,4 +1,4 @@
-// Changes a file so that nobody ever sees half of it.
+// Changes a file so that no reader ever sees half of it.
 #pragma once
 
 #include <sys/stat.h>
@@ -18,8 +18,8 @@ namespace zorva::util {
 [[nodiscard]] std::string replaceFile(const std::string& directory, const std::string& name, const std::string& text,
                                       const struct stat* like = nullptr);
 
-// Puts that text into a file that is there, in place, and syncs it. Throws std::runtime_error, with one line; the file
-// may then be cut short.
+// Writes that text into an existing file, in place, and syncs it. Throws std::runtime_error, with one line; the file
+// may then be truncated.
 void overwriteFile(const std::string& path, const std::string& text);
 
 // Writes all of it. False, with errno, where that fails.
@@ -28,7 +28,7 @@ bool writeAll(const FileDescriptor& file, std::string_view text);
 // A name is on the disk when its directory is. False, with errno, where that cannot be synced.
 bool syncDirectory(const std::string& directory);
 
-// Syncs a file. False, with errno, where that fails.
+// Syncs a file. False, with errno, if that fails.
 bool syncFile(const std::string& path);
 
 }  // namespace zorva::util

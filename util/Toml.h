@@ -62,7 +62,7 @@ class TomlTable {
   // A list of texts that is not empty; `expected` describes it in the error.
   void take(const char* key, std::optional<std::vector<std::string>>& value, const char* expected);
 
-  // Refuses the keys that nothing has taken.
+  // Refuses the keys that were not taken.
   void finish() const;
 
   [[noreturn]] void fail(const char* key, const std::string& problem) const;

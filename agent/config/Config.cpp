@@ -94,7 +94,7 @@ Config readConfig(const std::string& path) {
 }
 
 Config readDefaultConfig() {
-  // Not from the environment of a set-user-id program.
+  // A set-user-id program does not use the environment.
   const char* named = ::secure_getenv("ZORVAGENT_CONFIG");
   if (named != nullptr && *named != '\0') return readConfig(named);
   const bool absent = ::access(kDefaultFile, F_OK) != 0 && errno == ENOENT;

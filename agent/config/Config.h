@@ -1,5 +1,6 @@
-// The agent's configuration.
 #pragma once
+
+// The agent's configuration.
 
 #include <stdexcept>
 #include <string>
@@ -9,11 +10,12 @@
 
 namespace zorva::agent {
 
-// A file that was written by a person and is wrong: the configuration, or the JSON document of a tree. what() is one
-// line, "FILE:LINE: KEY: what is wrong", without the parts that are not known.
+/// An error in a file that a person wrote: the configuration, or the JSON document of a tree. what() is one line,
+/// "FILE:LINE: KEY: what is wrong", without the parts that are not known.
 class ZORVA_AGENT_API ConfigError : public std::runtime_error {
  public:
-  // line counts from 1, 0 is unknown; key and file may be empty. Control characters in them come out escaped in what().
+  /// line counts from 1, 0 is unknown; key and file may be empty. Control characters in them come out escaped in
+  /// what().
   ConfigError(const std::string& file, int line, const std::string& key, const std::string& problem);
   ~ConfigError() override;
 
@@ -29,36 +31,36 @@ class ZORVA_AGENT_API ConfigError : public std::runtime_error {
   std::string problem_;
 };
 
-// Where the agent keeps what was set.
+/// The default directory for values that were set.
 inline constexpr const char* kDefaultDataDir = "/var/lib/zorvagent/";
 
-// Paths that are not absolute are taken from the directory of the configuration's file.
+/// Relative paths start at the directory of the configuration's file.
 struct Config {
-  std::string file;  // what it was read from; empty for the built-in defaults
+  std::string file;  ///< the file; empty for the built-in defaults
 
-  // [agent]
-  std::string dataDir = kDefaultDataDir;  // ends in a slash
-  std::string systemName;                 // empty: the name that the tree's source tells
+  /// [agent]
+  std::string dataDir = kDefaultDataDir;  ///< ends in a slash
+  std::string systemName;                 ///< empty: the name from the tree's source
   std::string language = "en";
 
-  // [tree]
-  std::string source = "host";  // or "file"
-  std::string treeFile;         // the JSON document of source "file"
+  /// [tree]
+  std::string source = "host";  ///< or "file"
+  std::string treeFile;         ///< the JSON document of source "file"
   bool includeLoopback = false;
 
-  // [log]
-  int logLevel = util::kLevelError;  // lines below it are dropped
+  /// [log]
+  int logLevel = util::kLevelError;  ///< lines below it are dropped
   std::string logTarget = "stderr";
   int traceLevel = util::kLevelError;
   std::string traceTarget = "off";
 };
 
-// Reads and checks a configuration (TOML 1.0). Throws ConfigError for whatever is wrong with it, a file that cannot be
-// read included. Thread-safe.
+/// Reads and checks a configuration (TOML 1.0). Throws ConfigError for whatever is wrong with it, a file that cannot be
+/// read included. Thread-safe.
 ZORVA_AGENT_API Config readConfig(const std::string& path);
 
-// The configuration of this process as its environment asks for it: the file that ZORVAGENT_CONFIG names, else
-// /etc/zorvagent/agent.toml, else, where that is not there, the built-in defaults. Throws as readConfig does.
+/// The configuration of this process as its environment asks for it: the file that ZORVAGENT_CONFIG names, else
+/// /etc/zorvagent/agent.toml, else, where that is not there, the built-in defaults. Throws as readConfig does.
 ZORVA_AGENT_API Config readDefaultConfig();
 
 }  // namespace zorva::agent

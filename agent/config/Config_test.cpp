@@ -14,7 +14,7 @@ class ConfigTest : public ::testing::Test {
  protected:
   Config read(const std::string& text) { return readConfig(directory_.write("agent.toml", text)); }
 
-  // What is wrong with a configuration, without the directory.
+  // The error of a configuration, without the directory.
   std::string wrong(const std::string& text) {
     try {
       read(text);

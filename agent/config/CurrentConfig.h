@@ -1,5 +1,6 @@
-// The configuration of this process.
 #pragma once
+
+// The configuration of this process.
 
 #include <atomic>
 #include <deque>
@@ -10,26 +11,26 @@
 
 namespace zorva::agent {
 
-// One for the process, made when it is first asked for, ended when the library is unloaded. Thread-safe. A fork waits
-// until nobody is inside, so that the child finds it whole.
+/// One for the process, made at its first use, destroyed when the library is unloaded. Thread-safe. A fork waits until
+/// no thread is inside, so that the child gets a consistent state.
 class CurrentConfig {
  public:
   static CurrentConfig& instance();
 
-  // The configuration, read when it is first asked for; the built-in defaults where it is wrong. What this returns
-  // stays valid until the library is unloaded.
+  /// The configuration, read at its first use; the built-in defaults if it is wrong. The result is valid until the
+  /// library is unloaded.
   const Config& get() { return loaded().config; }
 
-  // Whether the configuration is wrong, and the defaults are used.
+  /// Whether the configuration is wrong, and the defaults are used.
   bool isWrong() { return loaded().error.has_value(); }
 
-  // Throws the ConfigError of a configuration that is wrong.
+  /// Throws the ConfigError of a wrong configuration.
   void check();
 
-  // Uses this configuration from now on.
+  /// Uses this configuration from now on.
   void use(const Config& config);
 
-  // The next question reads it again.
+  /// The next question reads it again.
   void forget() { loaded_.store(nullptr, std::memory_order_release); }
 
  private:
@@ -43,7 +44,7 @@ class CurrentConfig {
   const Loaded& loaded();
 
   std::mutex mutex_;
-  std::deque<Loaded> configs_;  // the last one holds; earlier ones stay for those who point at them
+  std::deque<Loaded> configs_;  ///< the last one holds; earlier ones stay for those who point at them
   std::atomic<const Loaded*> loaded_ = nullptr;
 };
 

@@ -45,7 +45,7 @@ FileLock::FileLock(util::FileDescriptor file, const std::string& path, Mode mode
   }
 }
 
-// A process that was forked meanwhile has the descriptor too, and closing ours alone would leave the lock held.
+// A process that was forked in the meantime has the descriptor too; closing only ours would leave the lock held.
 FileLock::~FileLock() { ::flock(file_.get(), LOCK_UN); }
 
 }  // namespace zorva::agent

@@ -1,5 +1,6 @@
-// Locks among processes, by way of files.
 #pragma once
+
+// Locks between processes, with files.
 
 #include <sys/types.h>
 
@@ -10,21 +11,21 @@
 
 namespace zorva::agent {
 
-// A lock among processes, and among threads, by way of a file of its own that is never removed. Each object has its own
-// open file. Held until the object ends.
+/// A lock between processes, and between threads, on its own file, which is never removed. Each object has its own open
+/// file. Held until the object is destroyed.
 class FileLock {
  public:
   enum class Mode { Shared, Exclusive };
   using Deadline = std::chrono::steady_clock::time_point;
 
-  // Ten seconds from now: nobody who holds a lock needs longer.
+  /// Ten seconds from now: no owner of a lock needs longer.
   static Deadline usualDeadline();
 
-  // Opens the file, or makes it, and waits for the exclusive lock until the usual deadline. Throws std::runtime_error,
-  // with one line, where it cannot be had.
+  /// Opens the file, or makes it, and waits for the exclusive lock until the usual deadline. Throws std::runtime_error,
+  /// with one line, if the lock cannot be taken.
   explicit FileLock(const std::string& path);
 
-  // Locks a file that is open. An exclusive lock may need one that is open for writing.
+  /// Locks an open file. An exclusive lock may need a file that is open for writing.
   FileLock(util::FileDescriptor file, const std::string& path, Mode mode, Deadline deadline);
 
   ~FileLock();
@@ -37,7 +38,7 @@ class FileLock {
   util::FileDescriptor file_;
 };
 
-// Opens a lock's file for reading and writing, or makes it with these rights. errno says why there is none.
+/// Opens a lock's file for reading and writing, or makes it with these rights. If that fails, errno has the reason.
 util::FileDescriptor openLockFile(const std::string& path, mode_t rights);
 
 }  // namespace zorva::agent

@@ -16,24 +16,24 @@
 namespace zorva::agent {
 namespace {
 
-// In a directory: names that come and go, and permissions that change, also its own end.
+// Of a directory: names that are added or removed, changed permissions, also of the directory itself, and its removal.
 constexpr std::uint32_t kDirectoryEvents = IN_CREATE | IN_DELETE | IN_MOVED_FROM | IN_MOVED_TO | IN_ATTRIB |
                                            IN_DELETE_SELF | IN_MOVE_SELF | IN_ONLYDIR | IN_MASK_ADD;
-// Of a file: its contents, also when they are written by way of another name of it.
+// Of a file: its contents, also if they are written under another name of the file.
 constexpr std::uint32_t kFileEvents =
     IN_MODIFY | IN_CLOSE_WRITE | IN_ATTRIB | IN_DELETE_SELF | IN_MOVE_SELF | IN_DONT_FOLLOW | IN_MASK_ADD;
 
 constexpr int kMostLinks = 40;   // as many as the kernel follows
-constexpr int kMostReads = 256;  // of reports at one question; there are seldom more than one
+constexpr int kMostReads = 256;  // of events at one check; usually there is one at most
 
-// The target of a symbolic link, or empty text where there is none under that path.
+// The target of a symbolic link, or empty text if there is none under that path.
 std::string readLink(const std::string& path) {
   std::array<char, PATH_MAX> target;
   const ssize_t length = ::readlink(path.c_str(), target.data(), target.size());
   return length > 0 ? std::string(target.data(), static_cast<std::size_t>(length)) : std::string();
 }
 
-// Takes the first name off a path, and the slashes about it.
+// Removes the first name of a path, and the slashes around it.
 std::string takeName(std::string& path) {
   const std::size_t begin = std::min(path.find_first_not_of('/'), path.size());
   const std::size_t end = std::min(path.find('/', begin), path.size());
@@ -59,13 +59,13 @@ void FileWatch::watch(const std::vector<std::string>& paths) {
 bool FileWatch::changed() {
   if (!watching_) return true;
   if (comparisonsLeft_ <= 0) return blind_ || readReports();
-  // The last comparison says yes whatever it sees, so that the caller reads again once inotify is there.
+  // The last comparison always returns true, so that the caller reads again once inotify is active.
   if (--comparisonsLeft_ == 0) return true;
   return std::any_of(states_.begin(), states_.end(), [this](const State& state) { return differs(state); });
 }
 
-// A change bears the kernel's coarse time, which stands still for some milliseconds. What was changed in the very tick
-// in which it is looked at could be changed again in that tick without a trace.
+// A change gets the kernel's coarse time, which changes only every few milliseconds. A file that was changed in the
+// same tick in which it is checked could be changed again in that tick without a visible difference.
 FileWatch::State FileWatch::stateOf(const std::string& path) {
   State state;
   state.path = path;
@@ -105,7 +105,7 @@ void FileWatch::startInotify(const std::vector<std::string>& paths) {
   removeAllBut(places_, old);
 }
 
-// Watches on ways that no file leads along any more.
+// Removes watches that are not on the way to any file.
 void FileWatch::removeAllBut(const std::vector<Place>& kept, const std::vector<Place>& old) {
   for (const Place& place : old) {
     const auto isSame = [&place](const Place& other) { return other.descriptor == place.descriptor; };
@@ -125,7 +125,7 @@ bool FileWatch::readReports() {
       inotify_event event;
       std::memcpy(&event, buffer.data() + place, sizeof event);
       const char* name = event.len == 0 ? "" : buffer.data() + place + sizeof event;
-      // IN_Q_OVERFLOW: reports were lost.
+      // IN_Q_OVERFLOW: events were lost.
       if ((event.mask & IN_Q_OVERFLOW) != 0 || concerns(event.wd, name)) changed = true;
       place += sizeof event + event.len;
     }
@@ -133,7 +133,7 @@ bool FileWatch::readReports() {
   return true;
 }
 
-// Each directory is watched before the name in it is looked up: what changes after the look is reported.
+// Each directory is watched before the name in it is looked up: a change after the look-up is reported.
 void FileWatch::watchWay(const std::string& path) {
   std::string directory = "/";
   std::string rest = path.starts_with('/') ? path : currentDirectory() + '/' + path;
@@ -141,7 +141,7 @@ void FileWatch::watchWay(const std::string& path) {
     const std::string name = takeName(rest);
     if (name.empty() || name == ".") continue;
     if (name == "..") {
-      // The directory is free of links by now, so its parent is its path without the last name.
+      // At this point the directory has no links in it, so its parent is its path without the last name.
       if (directory.size() > 1) directory.erase(directory.rfind('/', directory.size() - 2) + 1);
       continue;
     }
@@ -163,7 +163,7 @@ void FileWatch::watchWay(const std::string& path) {
 bool FileWatch::add(const std::string& path, unsigned int mask, const std::string& name) {
   const int descriptor = ::inotify_add_watch(inotify_.get(), path.c_str(), mask);
   if (descriptor < 0) {
-    // What is not there yet is noticed by the directory before it.
+    // If a file does not exist yet, the watch of its directory reports it.
     if (errno != ENOENT && errno != ENOTDIR && errno != ELOOP) blind_ = true;
     return false;
   }
@@ -171,7 +171,7 @@ bool FileWatch::add(const std::string& path, unsigned int mask, const std::strin
   return true;
 }
 
-// A report without a name is of the watched thing itself, be it that it is gone.
+// An event without a name is about the watched object itself, or says that it was removed.
 bool FileWatch::concerns(int descriptor, const char* name) const {
   return std::any_of(places_.begin(), places_.end(), [&](const Place& place) {
     return place.descriptor == descriptor && (*name == '\0' || place.name == name);

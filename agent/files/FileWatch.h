@@ -1,5 +1,6 @@
-// Tells when one of a few files may have changed.
 #pragma once
+
+// Detects that one of a few files may have changed.
 
 #include <sys/stat.h>
 
@@ -10,40 +11,40 @@
 
 namespace zorva::agent {
 
-// At first it compares what the kernel says of each file; after many questions it goes over to inotify, with which a
-// question costs a third. (To begin with inotify would cost a short-lived program dear: when a process with watches
-// ends, the kernel keeps it waiting for some twenty milliseconds.)
-//
-// By inotify each file itself is watched and every directory that the way to it leads through, along symbolic links, so
-// that a file that comes, goes, or is replaced by a rename anywhere on the way is noticed. Where something cannot be
-// watched, every question is answered with yes: the caller then reads more often than it need, and never too seldom.
-//
-// Belongs to one thread at a time, and to one process: a forked one assigns a new watch.
+/// At first it compares the kernel's data of each file. After many checks it switches to inotify, with which a check
+/// costs a third. (Inotify from the start would be expensive for a short-lived program: when a process with watches
+/// ends, the kernel makes it wait for some twenty milliseconds.)
+///
+/// With inotify, each file itself is watched and every directory on the way to it, along symbolic links. So it notices
+/// a file that is added, removed, or replaced by a rename anywhere on the way. If something cannot be watched, every
+/// check returns true: the caller then reads more often than necessary, but never too seldom.
+///
+/// Belongs to one thread at a time, and to one process: a forked one assigns a new watch.
 class FileWatch {
  public:
   static constexpr int kComparisons = 1000;
 
-  // comparisons is the number of questions before it goes over to inotify.
+  /// comparisons is the number of checks before it switches to inotify.
   explicit FileWatch(int comparisons = kComparisons) : comparisonsLeft_(comparisons) {}
 
-  // Watches these files and no others from now on, and forgets what was noticed before. What is read after this returns
-  // is either as it stays or will be noticed as changed.
+  /// Watches only these files from now on, and drops earlier events. Data that is read after this returns is either
+  /// current or will be noticed as changed.
   void watch(const std::vector<std::string>& paths);
 
-  // Whether something may have happened to a watched file since watch was called. Never blocks. After a yes the caller
-  // calls watch again, reads again, and then asks again.
+  /// Whether a watched file may have changed since watch was called. Never blocks. If so, the caller calls watch again,
+  /// reads again, and then checks again.
   bool changed();
 
  private:
-  // What tells one state of a file from another. Nobody can set a file's ctime.
+  /// The data that identify a state of a file. A file's ctime cannot be set.
   struct State {
     std::string path;
     int error = 0;
     struct stat status {};
-    bool mayHideChanges = false;  // changed so lately that a change yet to come could bear the same time
+    bool mayHideChanges = false;  ///< changed so recently that a later change could have the same time
   };
 
-  // A name in a watched directory, or a watched file itself, which has no name.
+  /// A name in a watched directory, or a watched file itself, which has no name.
   struct Place {
     int descriptor;
     std::string name;
@@ -59,12 +60,12 @@ class FileWatch {
   bool concerns(int descriptor, const char* name) const;
 
   int comparisonsLeft_;
-  bool watching_ = false;      // watch has been called
-  std::vector<State> states_;  // while it compares
+  bool watching_ = false;      ///< watch has been called
+  std::vector<State> states_;  ///< while it compares
 
-  util::FileDescriptor inotify_;  // kept once it is open: to close it takes long
+  util::FileDescriptor inotify_;  ///< kept once it is open: to close it takes long
   std::vector<Place> places_;
-  bool blind_ = false;  // something cannot be watched
+  bool blind_ = false;  ///< something cannot be watched
 };
 
 }  // namespace zorva::agent

@@ -21,13 +21,13 @@ namespace fs = std::filesystem;
 constexpr int kAlwaysCompare = 1000000;
 constexpr int kAlwaysWatch = 0;
 
-// Comparing and watching notice the same things.
+// Comparing and watching must notice the same changes.
 class FileWatchTest : public ::testing::TestWithParam<int> {
  protected:
   void watch(const std::string& name) { watchAll({directory_ / name}); }
 
   void watchAll(const std::vector<std::string>& paths) {
-    // Past the tick in which the test has made the files.
+    // Waits until the tick in which the test made the files is over.
     if (GetParam() == kAlwaysCompare) std::this_thread::sleep_for(std::chrono::milliseconds(20));
     watch_.watch(paths);
   }
@@ -41,7 +41,7 @@ INSTANTIATE_TEST_SUITE_P(, FileWatchTest, ::testing::Values(kAlwaysCompare, kAlw
 
 TEST_P(FileWatchTest, BeforeAnythingIsWatchedEverythingMayHaveChanged) { EXPECT_TRUE(watch_.changed()); }
 
-TEST_P(FileWatchTest, NothingChangedWhereNothingHappened) {
+TEST_P(FileWatchTest, NothingChangedIfNothingHappened) {
   directory_.write("file", "a");
   watch("file");
   EXPECT_FALSE(watch_.changed());
@@ -80,7 +80,7 @@ TEST_P(FileWatchTest, AFileThatComesIsNoticed) {
   EXPECT_TRUE(watch_.changed());
 }
 
-TEST_P(FileWatchTest, AFileThatGoesIsNoticed) {
+TEST_P(FileWatchTest, ARemovedFileIsNoticed) {
   directory_.write("file", "a");
   watch("file");
   fs::remove(directory_ / "file");
@@ -114,7 +114,7 @@ TEST_P(FileWatchTest, AFileInDirectoriesThatComeOneAfterTheOtherIsNoticed) {
   for (const char* directory : {"a", "a/b"}) {
     watch("a/b/file");
     fs::create_directory(directory_ / directory);
-    watch_.changed();  // may be noticed, and need not: there is no file before or after
+    watch_.changed();  // may be noticed or not: there is no file before or after
   }
   watch("a/b/file");
   EXPECT_FALSE(watch_.changed());
@@ -220,10 +220,10 @@ TEST(FileComparison, AfterItsNumberOfQuestionsFilesAreWatched) {
 }
 
 TEST(FileReports, ThatWereLostCountAsAChange) {
-  const TemporaryDirectory busy("/dev/shm");  // where making directories is quick
+  const TemporaryDirectory busy("/dev/shm");  // making directories is fast there
   FileWatch watch(kAlwaysWatch);
   watch.watch({busy / "file"});
-  // The kernel keeps some thousand reports and then says that it dropped one.
+  // The kernel keeps some thousand events and then reports that it dropped one.
   const std::string other = busy / "other";
   for (int i = 0; i < 20000; ++i) {
     if (::mkdir(other.c_str(), 0700) != 0) ::rmdir(other.c_str());

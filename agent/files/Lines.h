@@ -1,5 +1,6 @@
-// Texts of lines and words, as configuration files have them.
 #pragma once
+
+// Splits configuration files into lines and words.
 
 #include <string>
 #include <string_view>
@@ -7,10 +8,10 @@
 
 namespace zorva::agent {
 
-// Takes the first line off the text, without its end, LF or CRLF.
+/// Removes the first line from the text and returns it without its end, LF or CRLF.
 std::string_view takeLine(std::string_view& text);
 
-// The words of a line, which blanks and tabs part, up to a word that begins with "#" or ";".
+/// The words of a line, separated by blanks and tabs, up to a word that begins with "#" or ";".
 std::vector<std::string> wordsOf(std::string_view line);
 
 }  // namespace zorva::agent

@@ -9,7 +9,7 @@
 namespace ZV {
 namespace {
 
-// Far beyond any interface file; what is longer is no file of settings.
+// Far more than any interface file has; a larger file is no settings file.
 constexpr std::size_t kLargestFile = std::size_t{4} << 20;
 
 }  // namespace

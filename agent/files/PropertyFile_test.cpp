@@ -29,7 +29,7 @@ class PropertyFileTest : public ::testing::Test {
 
 TEST_F(PropertyFileTest, ALineIsSplitAtItsFirstEqualsSign) { EXPECT_EQ(valueIn("A=b=c\n", L"A"), L"b=c"); }
 
-TEST_F(PropertyFileTest, OfAKeyThatStandsTwiceTheFirstCounts) { EXPECT_EQ(valueIn("A=1\nA=2\n", L"A"), L"1"); }
+TEST_F(PropertyFileTest, OfAKeyThatOccursTwiceTheFirstCounts) { EXPECT_EQ(valueIn("A=1\nA=2\n", L"A"), L"1"); }
 
 TEST_F(PropertyFileTest, CommentsAndBlankLinesArePassedOver) {
   EXPECT_EQ(valueIn("#A=1\n\n   \nA=2\n", L"A"), L"2");
@@ -86,7 +86,7 @@ TEST_F(PropertyFileTest, WhatIsNotThereOrIsNoRegularFileCannotBeOpened) {
   EXPECT_FALSE(opens(""));
 }
 
-TEST_F(PropertyFileTest, AFifoThatNobodyWritesToDoesNotHoldAnybodyUp) {
+TEST_F(PropertyFileTest, AFifoWithoutAWriterDoesNotBlock) {
   ASSERT_EQ(::mkfifo((directory_ / "fifo").c_str(), 0600), 0);
   EXPECT_FALSE(opens(directory_ / "fifo"));
 }

@@ -6,11 +6,11 @@
 namespace zorva::agent {
 namespace {
 
-// What ends with "=" begins a line that was given a new value.
+// These begin a line with a new value.
 constexpr std::string_view kChangeable[] = {"HOSTNAME=", "DOMAINNAME=", "DNSSERVERS=", "CONFIG_NAME=", "DNSSUFFIXES="};
 constexpr std::size_t kLongestPiece = 511;
 
-template <class Fits>
+template <typename Fits>
 bool anyKey(Fits fits) {
   return std::any_of(std::begin(kChangeable), std::end(kChangeable), fits);
 }

@@ -1,4 +1,5 @@
-// What the agent's interface headers share: the mark of what libzorvagent.so.1 exports.
 #pragma once
+
+// Shared by the agent's interface headers: marks the symbols that libzorvagent.so.1 exports.
 
 #define ZORVA_AGENT_API __attribute__((visibility("default")))

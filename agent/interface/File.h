@@ -1,5 +1,6 @@
-// Files by path.
 #pragma once
+
+// Files by path.
 
 #include <string>
 
@@ -7,7 +8,7 @@
 
 namespace ZV::File {
 
-// The path of a file: any bytes but NUL.
+/// The path of a file: any bytes but NUL.
 class ZORVA_AGENT_API Path {
  public:
   explicit Path(const std::string& path);
@@ -17,7 +18,7 @@ class ZORVA_AGENT_API Path {
   std::string path_;
 };
 
-// True where a file of any kind stands under that path, symbolic links followed. Thread-safe.
+/// True if a file of any kind exists at that path, symbolic links followed. Thread-safe.
 ZORVA_AGENT_API bool exists(const std::wstring& path);
 
 }  // namespace ZV::File

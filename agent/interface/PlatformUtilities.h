@@ -1,5 +1,6 @@
-// Where the agent lives on this host.
 #pragma once
+
+// The agent's directory and name of this host.
 
 #include <string>
 
@@ -9,13 +10,13 @@ namespace ZV {
 
 namespace PlatformUtilities {
 
-// The agent's data directory, with a slash at its end. The text belongs to the agent and stays valid and unchanged
-// until the agent's library is unloaded. Thread-safe.
+/// The agent's data directory, with a slash at its end. The text belongs to the agent and stays valid and unchanged
+/// until the agent's library is unloaded. Thread-safe.
 ZORVA_AGENT_API const char* getMaroviaDataDir();
 
 }  // namespace PlatformUtilities
 
-// The managed system's name: the one configured, else the one of the tree's source. Thread-safe.
+/// The managed system's name: the configured one, else the one of the tree's source. Thread-safe.
 ZORVA_AGENT_API std::string getSystemName();
 
 }  // namespace ZV

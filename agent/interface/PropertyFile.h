@@ -1,5 +1,6 @@
-// Reads files of key=value lines.
 #pragma once
+
+// Reads files of key=value lines.
 
 #include <string>
 #include <vector>
@@ -9,9 +10,9 @@
 
 namespace ZV {
 
-// A reader bound to one path. The first "=" of a line splits it into key and value; lines that start with "#" and blank
-// lines are passed over; of a key that stands twice the first counts; the line end, LF or CRLF, is no part of the
-// value; quotes and blanks stay. Belongs to one thread.
+/// A reader for the file at one path. The first "=" of a line splits it into key and value. Lines that start with "#"
+/// and blank lines are skipped. If a key occurs twice, the first one counts. The line end, LF or CRLF, is not part of
+/// the value; quotes and blanks are. Belongs to one thread.
 class ZORVA_AGENT_API PropertyFile {
  public:
   explicit PropertyFile(const File::Path& path);
@@ -19,14 +20,14 @@ class ZORVA_AGENT_API PropertyFile {
   PropertyFile(const PropertyFile&) = delete;
   PropertyFile& operator=(const PropertyFile&) = delete;
 
-  // Reads the file. mode 1 means for reading, which is all there is. False where the file cannot be opened or read or
-  // is not a regular file; the reader then has no keys. Never blocks on a FIFO or device.
+  /// Reads the file. mode 1 means reading; there is no other mode. False if the file cannot be opened or read or is not
+  /// a regular file; the reader then has no keys. Never blocks on a FIFO or device.
   bool open(unsigned long mode);
 
-  // The value of the key, or empty text where there is none or nothing is open.
+  /// The value of the key, or empty text if there is none or nothing is open.
   std::wstring getValue(const std::wstring& key) const;
 
-  // Lets go of what open read.
+  /// Drops what open() read.
   void close();
 
  private:

@@ -1,5 +1,6 @@
-// The agent's logger and the buffer in which a line is put together.
 #pragma once
+
+// The agent's logger and the buffer in which a line is composed.
 
 #include <memory>
 #include <ostream>
@@ -9,23 +10,23 @@
 
 namespace ZALog {
 
-// Two streams of lines, the log and the trace, each with a threshold and a target of its own in the agent's
-// configuration. A line below the threshold is dropped. Safe to call from several threads at once; a line is written
-// whole. Nothing here fails or throws: a line that cannot be written is lost.
+/// Two streams of lines, the log and the trace, each with its own threshold and target in the agent's configuration. A
+/// line below the threshold is dropped. Safe to call from several threads at once; each line is written in one piece.
+/// Nothing here fails or throws: a line that cannot be written is lost.
 class ZORVA_AGENT_API ZALogger {
  public:
-  // function, file, line: where the line comes from; null counts as empty text.
-  // category: the source's name in the log, as "Zorvagent.DNSClient".
-  // level: 3000 flow, 4000 detail, 6000 error; any number may be given and is compared with the threshold.
-  // reserved1 to reserved3: null, 0 and 0; they are ignored.
-  // message: the text, in any bytes; control characters in it are written escaped.
+  /// function, file, line: the origin of the line; null counts as empty text.
+  /// category: the source's name in the log, as "Zorvagent.DNSClient".
+  /// level: 3000 flow, 4000 detail, 6000 error; any number may be given and is compared with the threshold.
+  /// reserved1 to reserved3: null, 0 and 0; they are ignored.
+  /// message: the text, in any bytes; control characters in it are written escaped.
   static void logLevelMessage(const char* function, const char* file, int line, const std::string& category, int level,
                               char* reserved1, int reserved2, int reserved3, const std::string& message);
   static void traceLevelMessage(const char* function, const char* file, int line, const std::string& category,
                                 int level, char* reserved1, int reserved2, int reserved3, const std::string& message);
 };
 
-// Gathers the text of one line. Belongs to one thread.
+/// Gathers the text of one line. Belongs to one thread.
 class ZORVA_AGENT_API ZAMessageBuffer {
  public:
   ZAMessageBuffer();
@@ -33,14 +34,14 @@ class ZORVA_AGENT_API ZAMessageBuffer {
   ZAMessageBuffer(const ZAMessageBuffer&) = delete;
   ZAMessageBuffer& operator=(const ZAMessageBuffer&) = delete;
 
-  // Appends text; null appends nothing. Returns this buffer.
+  /// Appends text; null appends nothing. Returns this buffer.
   ZAMessageBuffer& operator<<(const char* text);
 
-  // The stream that appends to this buffer, for values other than text. Made when it is first asked for.
+  /// The stream that appends to this buffer, for values other than text. Made at its first use.
   operator std::ostream&();
 
-  // The text gathered so far. The argument, this buffer or its stream, is only there so that a line can be put together
-  // and taken in one expression: buffer.str(buffer << "text"). Valid until more is appended or the buffer ends.
+  /// The text gathered so far. The argument, this buffer or its stream, only makes it possible to compose and take a
+  /// line in one expression: buffer.str(buffer << "text"). Valid until more is appended or the buffer is destroyed.
   const std::string& str(ZAMessageBuffer& buffer);
   const std::string& str(std::ostream& stream);
 
@@ -50,8 +51,8 @@ class ZORVA_AGENT_API ZAMessageBuffer {
   std::unique_ptr<Stream> stream_;
 };
 
-// Appends the address that the pointer holds, in the form of the stream's const void* inserter; never what it points
-// at.
+/// Appends the address in the pointer, in the format of the stream's const void* inserter; never the object that it
+/// points at.
 template <typename T>
 ZAMessageBuffer& operator<<(ZAMessageBuffer& buffer, T* pointer) {
   static_cast<std::ostream&>(buffer) << static_cast<const void*>(pointer);

@@ -15,7 +15,7 @@ struct Text {
   const char* text;
 };
 
-// English comes with every library; it stands in for a language that a library lacks.
+// Every library has English; it replaces a language that a library lacks.
 constexpr const char* kEnglish = "en";
 
 constexpr std::array kTexts{

@@ -33,7 +33,7 @@ TEST_F(Locale, TheTextsOfTheDnsClientProfileAreThere) {
             L"DNS server that the system is configured to use");
 }
 
-TEST_F(Locale, EnglishStandsInForALanguageThatALibraryLacks) {
+TEST_F(Locale, EnglishReplacesALanguageThatALibraryLacks) {
   for (const char* language : {"de", "", "de_DE.UTF-8"}) {
     EXPECT_EQ(ResourceString(getResourceLibrary(kDnsClientLibrary, language), L"MSGID_DNS_SERVER_CAPTION"),
               L"DNS Server");

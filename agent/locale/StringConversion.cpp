@@ -8,7 +8,7 @@
 namespace ZV {
 namespace {
 
-// A byte that is no UTF-8 stands as a lone low surrogate, which no UTF-8 text decodes to.
+// A byte that is not UTF-8 becomes a lone low surrogate, which no UTF-8 text decodes to.
 constexpr char32_t kByteBase = 0xDC00;
 
 bool isByte(char32_t character) { return character >= kByteBase + 0x80 && character <= kByteBase + 0xFF; }

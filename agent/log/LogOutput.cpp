@@ -36,7 +36,7 @@ constexpr int kNothing = std::numeric_limits<int>::max();
 
 std::atomic<int>& thresholdOf(LogStream stream) { return stream == LogStream::Log ? logThreshold : traceThreshold; }
 
-// Writes each line with one call, so that lines of several processes in one file stay whole.
+// Writes each line with one call, so that lines of several processes in one file do not mix.
 class DescriptorSink : public spdlog::sinks::base_sink<spdlog::details::null_mutex> {
  public:
   explicit DescriptorSink(int borrowed) : descriptor_(borrowed) {}
@@ -62,7 +62,7 @@ class DescriptorSink : public spdlog::sinks::base_sink<spdlog::details::null_mut
   int descriptor_;
 };
 
-// Opens a file for appending. A FIFO or a socket would block or end the process some day.
+// Opens a file for appending. A FIFO or a socket could block or end the process later.
 util::FileDescriptor openLogFile(const std::string& path) {
   constexpr mode_t kMode = 0640;
   util::FileDescriptor file(
@@ -95,7 +95,7 @@ Logger makeLogger(const std::string& target) {
   return logger;
 }
 
-// What syslog is to make of a level.
+// The syslog severity of a level.
 spdlog::level::level_enum severity(int level) {
   if (level >= util::kLevelError) return spdlog::level::err;
   return level >= util::kLevelDetail ? spdlog::level::info : spdlog::level::debug;
@@ -137,7 +137,7 @@ class Output {
   }
 
   ~Output() {
-    // A line that comes while the process ends is dropped.
+    // A line that arrives while the process ends is dropped.
     logThreshold = kNothing;
     traceThreshold = kNothing;
   }
@@ -206,7 +206,7 @@ class Output {
     }
   }
 
-  // A sink takes every line, and before the configuration is read nobody knows which to drop.
+  // A sink takes every line; and before the configuration is read it is not known which lines to drop.
   void publishThresholds() {
     for (const LogStream stream : {LogStream::Log, LogStream::Trace}) {
       const Stream& settings = streamOf(stream);
@@ -231,7 +231,7 @@ void writeLine(const LogCall& call) noexcept try {
   const std::lock_guard lock(outputMutex);
   output().write(call);
 } catch (...) {
-  // Lost, as a line that cannot be written.
+  // The line is lost, like any line that cannot be written.
 }
 
 void logOwn(int level, const char* function, const char* file, int line, const std::string& message) noexcept try {
@@ -241,7 +241,7 @@ void logOwn(int level, const char* function, const char* file, int line, const s
   const std::lock_guard lock(outputMutex);
   output().writeOwn(call);
 } catch (...) {
-  // Lost, as a line that cannot be written.
+  // The line is lost, like any line that cannot be written.
 }
 
 void setStreamLevel(LogStream stream, int level) {

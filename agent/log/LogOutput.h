@@ -1,5 +1,6 @@
-// Where lines go.
 #pragma once
+
+// Writes lines to their targets.
 
 #include <atomic>
 #include <string>
@@ -9,8 +10,7 @@
 
 namespace zorva::agent {
 
-// The level below which a stream drops lines. Starts so low that the first line goes on to the place where the
-// configuration is asked.
+/// The level below which a stream drops lines. It is very low at first, so that the first line reads the configuration.
 extern std::atomic<int> logThreshold;
 extern std::atomic<int> traceThreshold;
 
@@ -19,24 +19,24 @@ inline bool isDropped(LogStream stream, int level) {
   return level < threshold.load(std::memory_order_relaxed);
 }
 
-// Writes a line to the stream's target. Never throws.
+/// Writes a line to the stream's target. Never throws.
 void writeLine(const LogCall& call) noexcept;
 
-// Writes a line of the agent's own to the log, under the category "Zorvagent.Agent". Never throws.
+/// Writes one of the agent's own lines to the log, under the category "Zorvagent.Agent". Never throws.
 void logOwn(int level, const char* function, const char* file, int line, const std::string& message) noexcept;
 
 #define ZORVAGENT_LOG_ERROR(message) \
   zorva::agent::logOwn(zorva::util::kLevelError, static_cast<const char*>(__func__), __FILE__, __LINE__, (message))
 
-// Change a stream at run time. The target is "stderr", "syslog", "off" or the path of a file that is appended to;
-// std::runtime_error, with the reason, where that cannot be opened, and the target stays.
+/// Change a stream at run time. The target is "stderr", "syslog", "off" or the path of a file that is appended to.
+/// Throws std::runtime_error, with the reason, if that cannot be opened; the target is then unchanged.
 void setStreamLevel(LogStream stream, int level);
 void setStreamTarget(LogStream stream, const std::string& target);
 
-// Forgets the sink and all settings; the next line asks the configuration again.
+/// Drops the sink and all settings; the next line reads the configuration again.
 void resetLog();
 
-// From now on a fork waits until no line is being written. The first line does the same.
+/// From now on a fork waits until no line is being written. The first line does the same.
 void watchForksOfLog();
 
 }  // namespace zorva::agent

@@ -1,5 +1,6 @@
-// The two streams of lines, and a place that takes them instead of the configured targets.
 #pragma once
+
+// The two streams of lines, and a sink that takes them instead of the configured targets.
 
 #include <string>
 
@@ -9,7 +10,7 @@ namespace zorva::agent {
 
 enum class LogStream { Log, Trace };
 
-// One call of ZALog::ZALogger, with its arguments as they came.
+/// One call of ZALog::ZALogger, with its arguments as they came.
 struct LogCall {
   LogStream stream;
   const char* function;
@@ -23,21 +24,21 @@ struct LogCall {
   const std::string& message;
 };
 
-// Called under the log's lock: one call at a time, whatever the threads. It must not log itself. What it throws is
-// swallowed.
+/// Called under the log's lock: one call at a time, from any thread. It must not log itself. Its exceptions are
+/// ignored.
 class LogSink {
  public:
   virtual ~LogSink() = default;
 
-  // A call of the logger, whatever its level.
+  /// A call of the logger, whatever its level.
   virtual void record(const LogCall& call) = 0;
 
-  // A line of the agent itself, which did not come through ZALogger.
+  /// One of the agent's own lines, which did not come through ZALogger.
   virtual void recordOwn(int /*level*/, const std::string& /*message*/) {}
 };
 
-// Hands every call of the logger to the sink and writes no line to the targets, until null is given. The sink stays the
-// caller's and must live until then. Thread-safe.
+/// Passes every call of the logger to the sink and writes no line to the targets, until null is given. The caller keeps
+/// ownership of the sink, which must live until then. Thread-safe.
 ZORVA_AGENT_API void setLogSink(LogSink* sink);
 
 }  // namespace zorva::agent

@@ -109,7 +109,7 @@ TEST_F(ZALoggerTest, ATargetThatCannotBeOpenedIsRefusedAndTheOldOneStays) {
   EXPECT_NE(logged().find("still here"), std::string::npos);
 }
 
-TEST_F(ZALoggerTest, AConfiguredTargetThatCannotBeOpenedIsToldOnceAndItsLinesAreLost) {
+TEST_F(ZALoggerTest, AConfiguredTargetThatCannotBeOpenedIsReportedOnceAndItsLinesAreLost) {
   config_.logTarget = directory_ / "absent/log";
   zorva::agent::setConfig(config_);
   zorva::agent::reset();
@@ -184,7 +184,7 @@ TEST_F(ZALoggerTest, ASinkTakesEveryCallWhateverItsLevelAndNoLineGoesOut) {
   EXPECT_EQ(logged() + traced(), "");
 }
 
-TEST_F(ZALoggerTest, ASinkThatThrowsUpsetsNobody) {
+TEST_F(ZALoggerTest, ASinkThatThrowsDoesNoHarm) {
   struct Thrower : zorva::agent::LogSink {
     void record(const zorva::agent::LogCall&) override { throw 42; }
   } thrower;

@@ -5,7 +5,7 @@
 namespace ZALog {
 namespace {
 
-// Appends straight to a string, without a buffer of its own.
+// Appends directly to a string, without its own buffer.
 class StringAppender : public std::streambuf {
  public:
   explicit StringAppender(std::string& text) : text_(text) {}
@@ -25,7 +25,7 @@ class StringAppender : public std::streambuf {
   std::string& text_;
 };
 
-// Enough for most lines, so that a line that is put together of several pieces allocates once.
+// Enough for most lines, so that a line of several pieces needs one allocation.
 constexpr std::size_t kFirstRoom = 256;
 
 }  // namespace

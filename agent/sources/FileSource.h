@@ -1,5 +1,6 @@
-// A tree from a JSON document, for demonstrations and tests.
 #pragma once
+
+// A tree from a JSON document, for demonstrations and tests.
 
 #include <string>
 
@@ -14,7 +15,7 @@ class FileSource : public TreeSource {
 
   bool changed() override;
 
-  // Throws ConfigError where the document is wrong or cannot be read.
+  /// Throws ConfigError if the document is wrong or cannot be read.
   std::shared_ptr<const TreeSnapshot> read() override;
 
   void reopen() override;

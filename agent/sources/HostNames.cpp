@@ -20,7 +20,7 @@ std::string afterDot(const std::string& name) {
   return dot == std::string::npos ? std::string() : name.substr(dot + 1);
 }
 
-// The domain that one line of a hosts file gives the host, or empty text. Its words are an address, the canonical name,
+// The host's domain according to one line of a hosts file, or empty text. The words are an address, the canonical name,
 // and aliases.
 std::string domainInLine(const std::string& host, const StringList& words) {
   if (words.size() < 2) return {};

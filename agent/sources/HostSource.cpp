@@ -19,7 +19,7 @@ using namespace ZV::NodeLexicon;
 constexpr std::size_t kLargestFile = std::size_t{64} << 10;
 constexpr const char* kComputer = "Computer";
 
-// Raw enabled states, as PROP_ENABLED_STATE has them.
+// Raw enabled states, as in PROP_ENABLED_STATE.
 constexpr unsigned int kUpWithCarrier = 1;
 constexpr unsigned int kUpWithoutCarrier = 12;
 constexpr unsigned int kDown = 16;
@@ -32,7 +32,8 @@ constexpr unsigned int kBoth = 4098;
 
 unsigned int enabledState(const Link& link) {
   if ((link.flags & IFF_UP) == 0) return kDown;
-  // A driver that does not tell its operational state, a tunnel's say, still tells whether the lower layer is up.
+  // A driver that does not report its operational state, for example that of a tunnel, still reports whether the lower
+  // layer is up.
   const bool carrier =
       link.operState == IF_OPER_UP || (link.operState == IF_OPER_UNKNOWN && (link.flags & IFF_LOWER_UP) != 0);
   return carrier ? kUpWithCarrier : kUpWithoutCarrier;
@@ -82,7 +83,7 @@ void HostSource::reopen() {
   reader_.close();
 }
 
-// Before anything is read, so that what changes meanwhile is reported afterwards.
+// Called before anything is read, so that changes during the reading are reported afterwards.
 void HostSource::startWatching() {
   if (!watching_) monitor_.open();
   if (!watching_ || filesMoved_) watch_.watch({resolvConf_, stubResolvConf_, hosts_});
@@ -105,7 +106,7 @@ std::shared_ptr<const TreeSnapshot> HostSource::read() {
   std::unordered_set<std::string_view> seen;
   for (const Link& link : table.links) {
     if ((link.flags & IFF_LOOPBACK) != 0 && !options_.includeLoopback) continue;
-    // A dump that was interrupted may have one name twice; a report of the change is on its way.
+    // An interrupted dump may contain one name twice; the event of that change will follow.
     if (!seen.insert(link.name).second) continue;
     const auto own = std::make_shared<const AddressList>(std::move(addresses[link.index]));
     const std::size_t port = builder.add(system, NodeType::Port, link.name);
@@ -130,7 +131,7 @@ util::FileText HostSource::readLines(const std::string& path) {
   return file;
 }
 
-// A file that cannot be read counts as one that says nothing.
+// A file that cannot be read counts as empty.
 std::string HostSource::linesOf(const std::string& path) { return readLines(path).text; }
 
 HostSource::Resolver HostSource::readResolver() {
@@ -141,8 +142,8 @@ HostSource::Resolver HostSource::readResolver() {
     conf = parseResolvConf(file.text);
     StringList servers = conf.servers;
     if (namesOnlyLocalStub(conf)) {
-      const ResolvConf behind = parseResolvConf(linesOf(stubResolvConf_));
-      if (!behind.servers.empty()) servers = behind.servers;
+      const ResolvConf stub = parseResolvConf(linesOf(stubResolvConf_));
+      if (!stub.servers.empty()) servers = stub.servers;
     }
     result.servers = share(std::move(servers));
     result.search = share(conf.search);
@@ -152,13 +153,13 @@ HostSource::Resolver HostSource::readResolver() {
   return result;
 }
 
-// What the machine is called by its maker, where the firmware tells. It stays the same while the machine runs.
+// The maker's name of the product, if the firmware reports it. It does not change while the machine runs.
 std::string HostSource::product() {
   if (!product_.empty()) return product_;
   const util::FileText file = readLines(options_.root + "/sys/class/dmi/id/product_name");
   if (util::mayPass(file.error)) return kComputer;
   const std::string name(util::trimmedEnd(file.text, util::kWhiteSpace));
-  // "BMC" is what tells a service processor, and this is none.
+  // "BMC" would mark a service processor, and this is none.
   product_ = name.empty() || name == "BMC" ? kComputer : name;
   return product_;
 }

@@ -1,5 +1,6 @@
-// The tree of the host that the agent runs on.
 #pragma once
+
+// The tree of the host that the agent runs on.
 
 #include <string>
 
@@ -13,31 +14,31 @@ namespace zorva::agent {
 
 struct HostSourceOptions {
   bool includeLoopback = false;
-  std::string root;                           // put before the path of each file that is read; for tests
-  int comparisons = FileWatch::kComparisons;  // of files, before they are watched
+  std::string root;                           ///< put before the path of each file that is read; for tests
+  int comparisons = FileWatch::kComparisons;  ///< comparisons of files before they are watched
 };
 
-// Interfaces with state and addresses from the kernel; names from the kernel, /etc/hosts and resolv.conf; DNS servers
-// and search domains from /etc/resolv.conf, the same for every interface. The tree is that of the network namespace and
-// UTS namespace of the thread that asks first.
-//
-// Where /etc/resolv.conf cannot be read, or is no regular file, the nodes have no servers and no suffixes; where it can
-// and names none, they have empty lists. What stands past its first 64 KiB is not looked at.
+/// Interfaces with state and addresses from the kernel; names from the kernel, /etc/hosts and resolv.conf; DNS servers
+/// and search domains from /etc/resolv.conf, the same for every interface. The tree is that of the network namespace
+/// and UTS namespace of the thread that asks first.
+///
+/// If /etc/resolv.conf cannot be read, or is no regular file, the nodes have no servers and no suffixes. If it can be
+/// read and names none, they have empty lists. Only its first 64 KiB are read.
 class HostSource : public TreeSource {
  public:
   explicit HostSource(HostSourceOptions options = {});
 
   bool changed() override;
 
-  // Throws std::runtime_error, with one line, where the kernel cannot be asked.
+  /// Throws std::runtime_error, with one line, if the kernel cannot be queried.
   std::shared_ptr<const TreeSnapshot> read() override;
 
   void reopen() override;
 
  private:
-  // What the files say.
+  /// The content of the files.
   struct Resolver {
-    SharedStrings servers;  // null: not known
+    SharedStrings servers;  ///< null: not known
     SharedStrings search;
     HostNames names;
   };
@@ -50,17 +51,17 @@ class HostSource : public TreeSource {
 
   HostSourceOptions options_;
   std::string resolvConf_;
-  std::string stubResolvConf_;  // the servers behind a local stub
+  std::string stubResolvConf_;  ///< lists the servers of a local stub
   std::string hosts_;
 
   LinkMonitor monitor_;
   LinkReader reader_;
   FileWatch watch_;
   bool watching_ = false;
-  bool filesMoved_ = true;  // the ways to the files must be walked again
-  bool unread_ = false;     // a file could not be read for a reason that may pass
+  bool filesMoved_ = true;  ///< the ways to the files must be followed again
+  bool unread_ = false;     ///< a file could not be read for a temporary reason
   std::string nodeName_;
-  std::string product_;  // empty until it is read
+  std::string product_;  ///< empty until it is read
 };
 
 }  // namespace zorva::agent

@@ -29,16 +29,16 @@ using testing::succeedsInChild;
 using testing::TemporaryDirectory;
 namespace fs = std::filesystem;
 
-// A host whose files are the test's and whose network is whatever this process has.
+// A host with the test's files and this process's network.
 class HostFiles : public ::testing::Test {
  protected:
   HostFiles() {
     options_.root = directory_.path() + '.';
     options_.comparisons = 0;         // each change is noticed once
-    options_.includeLoopback = true;  // so that there is an interface wherever the test runs
+    options_.includeLoopback = true;  // so that there is an interface on every machine
   }
 
-  // The first interface, as a source that is asked now sees it.
+  // The first interface, as the source sees it now.
   const Node& look(HostSource& source) {
     if (source.changed() || tree_ == nullptr) {
       tree_ = source.read();
@@ -147,7 +147,7 @@ TEST_F(HostFiles, LinksThatLeadInACircleCountAsAbsent) {
   EXPECT_EQ(servers(source), (StringList{"absent"}));
 }
 
-TEST_F(HostFiles, BehindALocalStubTheRealServersAreShown) {
+TEST_F(HostFiles, TheServersOfALocalStubAreShown) {
   directory_.write("etc/resolv.conf", "nameserver 127.0.0.53\nsearch example.org\n");
   HostSource source(options_);
   EXPECT_EQ(servers(source), (StringList{"127.0.0.53"})) << "nothing better is known";
@@ -158,7 +158,7 @@ TEST_F(HostFiles, BehindALocalStubTheRealServersAreShown) {
 
 TEST_F(HostFiles, TheDomainComesFromHostsOrResolvConf) {
   EXPECT_TRUE(succeedsInChild([this] {
-    if (::unshare(CLONE_NEWUTS) != 0) return true;  // without the right to a name of its own the host has another
+    if (::unshare(CLONE_NEWUTS) != 0) return true;  // without the right to its own name the host has another one
     ::sethostname("host1", 5);
     directory_.write("etc/resolv.conf", "domain last.org\n");
     HostSource source(options_);
@@ -190,7 +190,7 @@ TEST_F(HostFiles, LoopbackIsLeftOutUnlessItIsWanted) {
   EXPECT_EQ(without.read()->find("/system/lo"), nullptr);
 }
 
-TEST_F(HostFiles, WithoutSocketsTheReasonIsTold) {
+TEST_F(HostFiles, WithoutSocketsTheReasonIsReported) {
   EXPECT_TRUE(succeedsInChild([this] {
     HostSource source(options_);
     rlimit before{};
@@ -200,14 +200,14 @@ TEST_F(HostFiles, WithoutSocketsTheReasonIsTold) {
     try {
       source.read();
     } catch (const std::runtime_error& error) {
-      ::setrlimit(RLIMIT_NOFILE, &before);  // UBSan needs a descriptor to look at an object
+      ::setrlimit(RLIMIT_NOFILE, &before);  // UBSan needs a descriptor to examine an object
       return std::string(error.what()) == "a netlink socket cannot be opened: Too many open files";
     }
     return false;
   }));
 }
 
-// What the test does in a network of its own; in a child process, since a process cannot go back.
+// Runs the test in its own network, in a child process, because a process cannot go back.
 template <typename Work>
 bool succeedsInNewNetwork(Work work) {
   return succeedsInChild([&] {
@@ -238,7 +238,7 @@ TEST(HostNetwork, InterfacesComeAndGo) {
   }));
 }
 
-// Whether a link comes to be in that state soon: the kernel takes its time over carriers.
+// Whether a link gets into that state soon: the kernel takes time for carriers.
 bool becomes(HostSource& source, const std::string& name, unsigned int state) {
   for (int i = 0; i < 300; ++i) {
     if (source.changed() && stateOf(*source.read(), name) == state) return true;
@@ -247,7 +247,7 @@ bool becomes(HostSource& source, const std::string& name, unsigned int state) {
   return false;
 }
 
-TEST(HostNetwork, TheRawStateTellsUpDownAndCarrier) {
+TEST(HostNetwork, TheRawStateShowsUpDownAndCarrier) {
   ZORVAGENT_NEEDS_NETWORK_NAMESPACE();
   EXPECT_TRUE(succeedsInNewNetwork([](Interfaces& interfaces, HostSource&) {
     HostSource source({.includeLoopback = true, .root = ""});
@@ -327,7 +327,7 @@ TEST(HostNetwork, ReportsThatWereLostCountAsAChange) {
   EXPECT_TRUE(succeedsInNewNetwork([](Interfaces& interfaces, HostSource& source) {
     source.read();
     interfaces.addBridge("zv0");
-    // More reports than the socket's buffer holds.
+    // More events than the socket's buffer holds.
     for (int i = 0; i < 3000; ++i) interfaces.setUp("zv0", i % 2 == 0);
     return source.changed() && stateOf(*source.read(), "zv0") == 16 && !source.changed();
   }));
@@ -346,7 +346,7 @@ TEST(HostNetwork, ManyInterfacesAreAllThere) {
   }));
 }
 
-// One walk as the readers of the tree do it: every node has its name and its grandparent.
+// One walk like those of the tree's readers: every node has its name and its grandparent.
 bool walks(std::size_t& nodes) {
   ZV::Instrumentation cursor;
   cursor.selectNode(NODE_NETWORK_IP_CONFIG);
@@ -409,7 +409,7 @@ TEST(HostNetwork, AForkedProcessHearsOfChangesAndDoesNotTakeThemFromItsParent) {
   }));
 }
 
-TEST(AddressOrigins, AreToldByRangeProtocolFlagsAndPrefix) {
+TEST(AddressOrigins, AreRecognizedByRangeProtocolFlagsAndPrefix) {
   constexpr unsigned int kFromRouter = 2;
   constexpr unsigned int kKernelLinkLocal = 3;
   const auto origin = [](const char* address, unsigned int prefix, unsigned int flags, unsigned int protocol) {

@@ -19,11 +19,11 @@
 namespace zorva::agent {
 namespace {
 
-// What the kernel fills at most in one go.
+// The most that the kernel sends at once.
 constexpr std::size_t kBufferSize = 32768;
-constexpr int kMostReports = 4096;  // read at one question; after that many the answer is known
-constexpr int kMostDumps = 8;       // of one table, while each is interrupted by a change
-// The kernel answers a dump while it is asked; this only bounds what a broken one could do.
+constexpr int kMostReports = 4096;  // read at one check; after that many the answer is known
+constexpr int kMostDumps = 8;       // of one table, if each is interrupted by a change
+// The kernel answers a dump at once; this only limits the damage of a broken kernel.
 constexpr timeval kLongestAnswer{5, 0};
 
 // Newer than the oldest kernel headers that this is built with.
@@ -50,7 +50,7 @@ void forEachAttribute(const nlmsghdr* message, std::size_t headerSize, Handler h
   for (; ::mnl_attr_ok(attribute, left()); attribute = ::mnl_attr_next(attribute)) handle(attribute);
 }
 
-// The text of an attribute, which need not end in a NUL.
+// The text of an attribute, which may lack the NUL at its end.
 std::string textOf(const nlattr* attribute) {
   const auto* text = static_cast<const char*>(::mnl_attr_get_payload(attribute));
   return {text, ::strnlen(text, ::mnl_attr_get_payload_len(attribute))};
@@ -64,7 +64,7 @@ Number numberOf(const nlattr* attribute) {
   return number;
 }
 
-// False for a message that is too short to be one.
+// False if the message is too short.
 bool parseLink(const nlmsghdr* message, Link& link) {
   if (::mnl_nlmsg_get_payload_len(message) < sizeof(ifinfomsg)) return false;
   const auto* info = static_cast<const ifinfomsg*>(::mnl_nlmsg_get_payload(message));
@@ -78,8 +78,8 @@ bool parseLink(const nlmsghdr* message, Link& link) {
   return !link.name.empty();
 }
 
-// The four numbers of an IPv4 address. inet_ntop writes them as well, but a host may have thousands of them, and it
-// takes longer over one than the kernel.
+// The four numbers of an IPv4 address. inet_ntop would also write them, but a host may have thousands of addresses, and
+// it takes longer for one than the kernel.
 std::string textOfIPv4(const std::array<unsigned char, sizeof(in_addr)>& address) {
   std::array<char, INET_ADDRSTRLEN> text;
   char* end = text.data();
@@ -103,7 +103,7 @@ std::string addressText(int family, const nlattr* attribute) {
   return text.data();
 }
 
-// False for a message that is too short to be one, or about another family.
+// False if the message is too short, or about another family.
 bool parseAddress(const nlmsghdr* message, LinkAddress& result) {
   if (::mnl_nlmsg_get_payload_len(message) < sizeof(ifaddrmsg)) return false;
   const auto* info = static_cast<const ifaddrmsg*>(::mnl_nlmsg_get_payload(message));
@@ -145,8 +145,8 @@ AddressOrigin originOf(const InterfaceAddress& address, unsigned int flags, unsi
   if (inLinkLocalRange || protocol == kLinkLocal) return AddressOrigin::LinkLocal;
   if (protocol == kFromRouter) return AddressOrigin::Slaac;
   if ((flags & IFA_F_PERMANENT) != 0) return AddressOrigin::Static;
-  // With a lifetime, and not by the kernel: a daemon has it from a router (those addresses cover the half of 128 bits
-  // that SLAAC makes up, or are temporary ones beside such) or from DHCP.
+  // With a lifetime that the kernel did not set: a daemon got it from a router (those addresses cover the half of 128
+  // bits that SLAAC generates, or are temporary ones beside such) or from DHCP.
   constexpr unsigned int kSlaacPrefix = 64;
   const bool temporary = (flags & (IFA_F_TEMPORARY | IFA_F_MANAGETEMPADDR)) != 0;
   if (isIPv6 && (temporary || address.prefixLength == kSlaacPrefix)) return AddressOrigin::Slaac;
@@ -167,7 +167,7 @@ bool LinkMonitor::changed() {
     char ignored = 0;
     const ssize_t got = ::recv(::mnl_socket_get_fd(socket_.get()), &ignored, sizeof ignored, MSG_DONTWAIT | MSG_TRUNC);
     if (got < 0 && (errno == EAGAIN || errno == EWOULDBLOCK)) return changed;
-    // Anything else is a report, or tells that some were lost (ENOBUFS).
+    // Anything else is an event, or says that events were lost (ENOBUFS).
     changed = true;
     if (got < 0 && errno != ENOBUFS && errno != EINTR) return changed;
   }
@@ -201,7 +201,7 @@ LinkTable LinkReader::read() {
     dump(RTM_GETADDR, takeAddress, [&table] { table.addresses.clear(); });
     return table;
   } catch (...) {
-    // Half an answer may still wait in the socket.
+    // A part of a response may still be in the socket.
     close();
     throw;
   }
@@ -223,7 +223,7 @@ void LinkReader::request(unsigned short type) {
   message->nlmsg_seq = ++sequence_;
   if (type == RTM_GETLINK) {
     ::mnl_nlmsg_put_extra_header(message, sizeof(ifinfomsg));
-    // Counters and the like are most of an answer, and nobody here wants them.
+    // Counters and the like are most of a response and are not needed here.
     ::mnl_attr_put_u32(message, IFLA_EXT_MASK, RTEXT_FILTER_SKIP_STATS);
   } else {
     ::mnl_nlmsg_put_extra_header(message, sizeof(ifaddrmsg));

@@ -1,5 +1,6 @@
-// The kernel's network interfaces and addresses over rtnetlink(7).
 #pragma once
+
+// The kernel's network interfaces and addresses over rtnetlink(7).
 
 #include <libmnl/libmnl.h>
 
@@ -12,52 +13,51 @@
 
 namespace zorva::agent {
 
-// An open netlink socket, close-on-exec.
+/// An open netlink socket, close-on-exec.
 using NetlinkSocket = std::unique_ptr<mnl_socket, decltype(&mnl_socket_close)>;
 
 struct Link {
   int index = 0;
-  unsigned int flags = 0;      // IFF_UP and the like
-  unsigned int operState = 0;  // RFC 2863, as in linux/if.h
-  std::string name;            // up to 15 bytes of nearly anything
+  unsigned int flags = 0;      ///< IFF_UP and the like
+  unsigned int operState = 0;  ///< RFC 2863, as in linux/if.h
+  std::string name;            ///< up to 15 bytes, almost any
 };
 
 struct LinkAddress {
-  int index = 0;  // of the link
+  int index = 0;  ///< of the link
   InterfaceAddress address;
 };
 
 struct LinkTable {
-  std::vector<Link> links;             // in the kernel's order
-  std::vector<LinkAddress> addresses;  // in the kernel's order: all of IPv4 before all of IPv6
+  std::vector<Link> links;             ///< in the kernel's order
+  std::vector<LinkAddress> addresses;  ///< in the kernel's order: all of IPv4 before all of IPv6
 };
 
-// Hears of changes. It belongs to the network namespace and the process in which it was opened.
+/// Receives change events. It belongs to the network namespace and the process in which it was opened.
 class LinkMonitor {
  public:
   LinkMonitor();
 
-  // Subscribes; what the kernel changes from now on is reported. False where no socket can be had; every question is
-  // then answered with yes.
+  /// Subscribes to the kernel's changes from now on. False if there is no socket; then every check returns true.
   bool open();
 
-  // Whether anything was reported since the last question, or reports may have been lost. Never blocks.
+  /// Whether there was an event since the last check, or events may have been lost. Never blocks.
   bool changed();
 
  private:
   NetlinkSocket socket_;
 };
 
-// Asks for the kernel's tables. A dump that was interrupted by a change is repeated; where changes keep coming, the
-// last one is taken as it is, since they are reported and the next look will read again.
+/// Requests the kernel's tables. A dump that was interrupted by a change is repeated. If changes keep coming, the last
+/// one is used, because the changes are reported and the next check will read again.
 class LinkReader {
  public:
   LinkReader();
 
-  // Throws std::runtime_error, with one line, where the kernel cannot be asked.
+  /// Throws std::runtime_error, with one line, if the kernel cannot be queried.
   LinkTable read();
 
-  // Closes the socket; the next read opens another.
+  /// Closes the socket; the next read opens another.
   void close();
 
  private:
@@ -74,7 +74,7 @@ class LinkReader {
   unsigned int sequence_ = 0;
 };
 
-// Where the kernel has an address from; flags are those of IFA_FLAGS, protocol that of IFA_PROTO or 0.
+/// The origin of an address; flags are those of IFA_FLAGS, protocol that of IFA_PROTO or 0.
 AddressOrigin originOf(const InterfaceAddress& address, unsigned int flags, unsigned int protocol);
 
 }  // namespace zorva::agent

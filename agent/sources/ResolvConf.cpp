@@ -14,7 +14,7 @@ bool isServer(const std::string& text) {
   return zone + 1 < text.size() && isIPv6Address(text.substr(0, zone));
 }
 
-// The words after the keyword, or none where the line has another one.
+// The words after the keyword, or none if the line has another one.
 StringList wordsAfter(std::string_view keyword, std::string_view line) {
   if (!line.starts_with(keyword)) return {};
   line.remove_prefix(keyword.size());

@@ -68,7 +68,7 @@ TEST(ResolvConf, MoreThanThreeServersAreAllListed) {
       serversIn("nameserver 192.0.2.1\nnameserver 192.0.2.2\nnameserver 192.0.2.3\nnameserver 192.0.2.4\n").size(), 4U);
 }
 
-TEST(ResolvConf, TheLocalStubIsKnownWhereItStandsAlone) {
+TEST(ResolvConf, TheLocalStubIsRecognizedIfItIsTheOnlyServer) {
   EXPECT_TRUE(namesOnlyLocalStub(parseResolvConf("nameserver 127.0.0.53\n")));
   EXPECT_FALSE(namesOnlyLocalStub(parseResolvConf("nameserver 127.0.0.53\nnameserver 192.0.2.1\n")));
   EXPECT_FALSE(namesOnlyLocalStub(parseResolvConf("nameserver 127.0.0.1\n")));

@@ -1,5 +1,6 @@
-// A network of its own for one test, and interfaces in it.
 #pragma once
+
+// A separate network for one test, and interfaces in it.
 
 #include <libmnl/libmnl.h>
 
@@ -8,28 +9,28 @@
 
 namespace zorva::agent::testing {
 
-// Moves the calling process, which should be a child made for that, into a new and empty network namespace with a user
-// namespace around it where that is needed. False where the kernel does not permit it.
+/// Moves the calling process, which should be a child made for that, into a new and empty network namespace, with a
+/// user namespace around it if necessary. False if the kernel does not permit it.
 bool enterNewNetwork();
 
-// Whether enterNewNetwork would work; tried in a child process.
+/// Whether enterNewNetwork would work; tried in a child process.
 bool canMakeNetworks();
 
-// Makes and changes interfaces in the network namespace of the calling thread. Throws std::runtime_error where the
-// kernel refuses.
+/// Makes and changes interfaces in the network namespace of the calling thread. Throws std::runtime_error if the kernel
+/// refuses.
 class Interfaces {
  public:
   Interfaces();
 
-  // A group is a number by which links are removed together, which is far quicker than one by one; 0 is none.
+  /// A group is a number by which links are removed together, which is much faster than one by one; 0 is none.
   void addBridge(const std::string& name, unsigned int group = 0);
-  // Two ends of a cable: each has carrier while the other one is up.
+  /// Two ends of a cable: each has carrier while the other one is up.
   void addPair(const std::string& name, const std::string& other);
   void remove(const std::string& name);
   void removeGroup(unsigned int group);
   void rename(const std::string& from, const std::string& to);
   void setUp(const std::string& name, bool up);
-  // flags are those of IFA_FLAGS; validSeconds 0 means for ever.
+  /// flags are those of IFA_FLAGS; validSeconds 0 means for ever.
   void addAddress(const std::string& name, const std::string& address, unsigned char prefixLength,
                   unsigned int flags = 0, unsigned int validSeconds = 0);
 

@@ -1,5 +1,6 @@
-// A directory of its own for one test.
 #pragma once
+
+// A temporary directory for one test.
 
 #include <sys/types.h>
 #include <sys/wait.h>
@@ -11,45 +12,45 @@
 
 namespace zorva::agent::testing {
 
-// Made under the system's temporary directory, removed with all that is in it at the end.
+/// Made in the system's temporary directory, and removed with its contents by the destructor.
 class TemporaryDirectory {
  public:
   TemporaryDirectory();
-  // In a directory of the caller's choice, if that is there.
+  /// In a directory of the caller's choice, if that exists.
   explicit TemporaryDirectory(const std::string& where);
   ~TemporaryDirectory();
   TemporaryDirectory(const TemporaryDirectory&) = delete;
   TemporaryDirectory& operator=(const TemporaryDirectory&) = delete;
 
-  // Ends in a slash.
+  /// Ends in a slash.
   const std::string& path() const { return path_; }
 
-  // The path of that name in it.
+  /// The path of that name in it.
   std::string operator/(const std::string& name) const { return path_ + name; }
 
-  // Writes a file, and the directories on the way to it; returns its path.
+  /// Writes a file, and the directories on the way to it; returns its path.
   std::string write(const std::string& name, const std::string& text) const;
 
-  // Makes a symbolic link, and the directories on the way to it.
+  /// Makes a symbolic link, and the directories on the way to it.
   void link(const std::string& target, const std::string& name) const;
 
  private:
   std::string path_;
 };
 
-// The whole file, or empty text.
+/// The content of the file, or empty text.
 std::string contentsOf(const std::string& path);
 
-// Starts the work in a child process. The work tells by its return value whether it went well; an exception counts as
-// no. Not to be called while the process has other threads: a child that was forked beside one may find the
-// sanitizers' allocator locked for ever.
+/// Starts the work in a child process. The work returns whether it succeeded; an exception counts as failure. Do not
+/// call this while the process has other threads: the sanitizers' allocator may stay locked for ever in a child that
+/// was forked beside one.
 template <typename Work>
 pid_t startChild(Work work);
 
-// Waits for the child's end: whether it went well. False too where it was ended by a signal.
+/// Waits for the child's end and returns whether it succeeded. False if it was ended by a signal.
 inline bool succeeded(pid_t child);
 
-// Both.
+/// Starts the work and waits for it.
 template <typename Work>
 bool succeedsInChild(Work work) {
   return succeeded(startChild(work));

@@ -48,7 +48,7 @@ std::string jsonToBytes(std::string_view text) {
   return bytes;
 }
 
-// Hands the text to the parser and lets on how far that has come.
+// Passes the text to the parser and reports its progress.
 class TrackingIterator {
  public:
   using iterator_category = std::input_iterator_tag;
@@ -71,8 +71,8 @@ class TrackingIterator {
   const char** reached_;  // the last character that was taken
 };
 
-// Counts lines up to the last character that the parser took. That is the end of the token at hand, or for a number the
-// character behind it, which may be a line feed but is itself still on the line.
+// Counts lines up to the last character that the parser read. That is the end of the current token, or for a number the
+// character after it, which may be a line feed but is itself still on the line.
 class LineCounter {
  public:
   explicit LineCounter(const std::string& text) : counted_(text.data()), reached_(text.data()) {}
@@ -91,14 +91,14 @@ class LineCounter {
   int line_ = 1;
 };
 
-// Builds the value while the parser runs. The parser itself needs no stack for what stands in one another.
+// Builds the value while the parser runs. The parser itself needs no stack for nested values.
 class Builder : public nlohmann::json_sax<nlohmann::json> {
  public:
   Builder(const std::string& name, LineCounter& lines) : name_(name), lines_(lines) {}
 
   JsonValue take() { return std::move(root_); }
 
-  // The parser goes on while its calls are answered with true.
+  // The parser continues while the callbacks return true.
   bool null() override {
     place(JsonValue::Kind::Null);
     return true;
@@ -163,7 +163,7 @@ class Builder : public nlohmann::json_sax<nlohmann::json> {
     JsonValue& value = place(kind);
     if (open_.size() == kDeepestJson) {
       throw ConfigError(name_, value.line, {},
-                        "lists and objects stand more than " + std::to_string(kDeepestJson) + " deep in one another");
+                        "lists and objects are nested more than " + std::to_string(kDeepestJson) + " deep");
     }
     open_.push_back(&value);
     return true;
@@ -174,7 +174,7 @@ class Builder : public nlohmann::json_sax<nlohmann::json> {
     std::sort(keys.begin(), keys.end());
     const auto repeated = std::adjacent_find(keys.begin(), keys.end());
     if (repeated != keys.end()) {
-      throw ConfigError(name_, object.line, std::string(*repeated), "stands twice in one object");
+      throw ConfigError(name_, object.line, std::string(*repeated), "is given twice in one object");
     }
   }
 
@@ -182,7 +182,7 @@ class Builder : public nlohmann::json_sax<nlohmann::json> {
   LineCounter& lines_;
   std::size_t values_ = 0;
   JsonValue root_;
-  // The lists and objects that are open. A pointer into items stays good: only the innermost one grows.
+  // The lists and objects that are open. A pointer into items stays valid, because only the innermost one grows.
   std::vector<JsonValue*> open_;
 };
 
@@ -228,7 +228,7 @@ void format(std::string& text, const JsonValue& value, std::size_t depth) {
       return;
     }
     default:
-      text += "null";  // what is never written: the agent's values have no such kinds
+      text += "null";  // never reached: the agent's values have no such kinds
   }
 }
 

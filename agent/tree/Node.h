@@ -1,5 +1,6 @@
-// A node of the instrumentation tree, with its properties by number.
 #pragma once
+
+// A node of the instrumentation tree, with its properties by number.
 
 #include <cstddef>
 #include <cstdint>
@@ -13,25 +14,25 @@
 
 namespace zorva::agent {
 
-// What a node is. The interface headers know the last one only; cursors reach the others by path.
+/// The type of a node. The interface headers know only the last one; cursors reach the others by path.
 enum class NodeType : unsigned int {
   Root = 0,
-  System = 1,  // a computer, or the service processor of one
-  Port = 2,    // a network interface
+  System = 1,  ///< a computer, or the service processor of one
+  Port = 2,    ///< a network interface
   NetworkIPConfig = ZV::NodeLexicon::NODE_NETWORK_IP_CONFIG,
 };
 
-// The numbers of the interface headers, and one that only the agent's own readers see.
+/// The numbers of the interface headers, and one that only the agent's own readers see.
 using PropertyNumber = unsigned int;
-inline constexpr PropertyNumber kAddresses = 0x10001;  // the interface's IP addresses, an AddressList
+inline constexpr PropertyNumber kAddresses = 0x10001;  ///< the interface's IP addresses, an AddressList
 
-// Where an address came from, as the kernel's flags and protocol of the address tell.
+/// The origin of an address, from the kernel's flags and protocol of the address.
 enum class AddressOrigin : std::uint8_t { Unknown, Static, Dhcp, Slaac, LinkLocal };
 
 enum class AddressFamily : std::uint8_t { IPv4, IPv6 };
 
 struct InterfaceAddress {
-  std::string address;  // in the text form of inet_ntop
+  std::string address;  ///< in the text format of inet_ntop
   unsigned int prefixLength = 0;
   AddressOrigin origin = AddressOrigin::Unknown;
 
@@ -44,7 +45,7 @@ struct InterfaceAddress {
 using StringList = std::vector<std::string>;
 using AddressList = std::vector<InterfaceAddress>;
 
-// Lists are shared: the same servers stand at every interface of a host.
+/// Lists are shared: every interface of a host has the same servers.
 using SharedStrings = std::shared_ptr<const StringList>;
 using SharedAddresses = std::shared_ptr<const AddressList>;
 using PropertyValue = std::variant<unsigned int, std::string, SharedStrings, SharedAddresses>;
@@ -52,46 +53,46 @@ using PropertyValue = std::variant<unsigned int, std::string, SharedStrings, Sha
 struct Property {
   PropertyNumber number = 0;
   PropertyValue value;
-  bool overlaid = false;  // the value was set through the agent and stands in for the source's own
+  bool overlaid = false;  ///< the value was set through the agent and replaces the source's own
 };
 
-// Whether two values are of one type and equal, lists by their elements.
+/// Whether two values are of one type and equal, lists by their elements.
 ZORVA_AGENT_API bool equalValues(const PropertyValue& left, const PropertyValue& right);
 
-// A node is part of one immutable TreeSnapshot and lives as long as that; it may be read from any thread.
+/// A node is part of one immutable TreeSnapshot and lives as long as it; any thread may read it.
 class ZORVA_AGENT_API Node {
  public:
   NodeType type() const { return type_; }
 
-  // Bytes as the host gives them: no "/", no NUL, not empty but for the root; unlike that of any sibling.
+  /// Bytes as the host gives them: no "/", no NUL, empty only for the root; different from those of its siblings.
   const std::string& name() const { return name_; }
 
-  // The names from the root down, each with a "/" before it; "/" for the root.
+  /// The names from the root down, each with a "/" before it; "/" for the root.
   const std::string& path() const { return path_; }
 
   const std::string& description() const { return description_; }
 
-  // True for the node of a service processor.
+  /// True for the node of a service processor.
   bool isServiceProcessor() const { return type_ == NodeType::System && description_ == "BMC"; }
 
-  // The place of this node and of its parent in TreeSnapshot::nodes(); the root is its own parent.
+  /// The index of this node and of its parent in TreeSnapshot::nodes(); the root is its own parent.
   std::size_t index() const { return index_; }
   std::size_t parentIndex() const { return parentIndex_; }
 
   const std::vector<Property>& properties() const { return properties_; }
 
-  // The property, or null where the node has none of that number.
+  /// The property, or null if the node has none with that number.
   const Property* find(PropertyNumber number) const;
 
-  // The value of a property, or null where the node lacks it or has it with another type.
+  /// The value of a property, or null if the node lacks it or has it with another type.
   const std::string* text(PropertyNumber number) const;
   const unsigned int* number(PropertyNumber number) const;
   const StringList* list(PropertyNumber number) const;
 
-  // The addresses of the interface, in the kernel's order; empty where none are known.
+  /// The addresses of the interface, in the kernel's order; empty if none are known.
   const AddressList& addresses() const;
 
-  // True where the node has the property and its value was set through the agent.
+  /// True if the node has the property and its value was set through the agent.
   bool isOverlaid(PropertyNumber number) const;
 
  private:

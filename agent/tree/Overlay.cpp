@@ -106,7 +106,7 @@ void Overlay::set(const std::string& path, PropertyNumber property, const std::o
   write(values);
 }
 
-// Where nothing was ever set there is perhaps no directory either in which to lock.
+// If no value was ever set, the directory for the lock may not exist either.
 bool Overlay::isThere() const { return ::access(file_.c_str(), F_OK) == 0 || errno != ENOENT; }
 
 std::size_t Overlay::clear(const std::function<bool(const std::string& path)>& chosen) const {
@@ -128,7 +128,7 @@ std::size_t Overlay::clearAll() const {
     cleared = countValues(read());
     if (cleared == 0) return 0;
   } catch (const ConfigError&) {
-    // Unreadable values are taken back with the rest.
+    // Unreadable values are removed with the rest.
   }
   write({});
   return cleared;

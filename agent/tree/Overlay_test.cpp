@@ -64,7 +64,7 @@ class OverlayTest : public ::testing::Test {
     return cursor.setProperty(property, std::move(value));
   }
 
-  // What a cursor that is placed now sees.
+  // The value that a cursor sees that is placed now.
   static std::string get(const std::string& path, Properties property) {
     Instrumentation cursor;
     cursor.selectNode(NODE_NETWORK_IP_CONFIG);
@@ -80,7 +80,7 @@ class OverlayTest : public ::testing::Test {
   const std::string eth1_ = "/system/eth1/ip";
 };
 
-TEST_F(OverlayTest, ThereIsNothingToTakeBackWhereThereIsNoDirectory) {
+TEST_F(OverlayTest, ThereIsNothingToRemoveIfThereIsNoDirectory) {
   std::filesystem::remove_all(data());
 
   EXPECT_EQ(clearOverlay(), 0U);
@@ -224,7 +224,7 @@ TEST_F(OverlayTest, ADataDirectoryThatIsNotWritableFailsTheWriteAndLeavesTheOldV
   EXPECT_NE(logged().find("overlay.json.new: cannot be opened: Permission denied"), std::string::npos) << logged();
 }
 
-// The kernel's own limit of a file's size stands in for a disk that is full: writing stops in the middle.
+// The kernel's limit of a file's size simulates a full disk: writing stops in the middle.
 TEST_F(OverlayTest, AFullDiskFailsTheWriteAndLeavesTheOldValues) {
   ASSERT_TRUE(set(eth0_, PROP_HOST_NAME, "old"));
   const std::string before = contentsOf(overlayFile());
@@ -236,7 +236,7 @@ TEST_F(OverlayTest, AFullDiskFailsTheWriteAndLeavesTheOldValues) {
     return !set(eth0_, PROP_HOST_NAME, std::string(100000, 'x'));
   }));
   EXPECT_EQ(contentsOf(overlayFile()), before);
-  EXPECT_FALSE(std::filesystem::exists(overlayFile() + ".new")) << "nothing is left behind";
+  EXPECT_FALSE(std::filesystem::exists(overlayFile() + ".new")) << "no file is left over";
 }
 
 TEST_F(OverlayTest, AFileThatIsWrongIsLoggedAndNotUsedAndNotWrittenOver) {
@@ -251,7 +251,7 @@ TEST_F(OverlayTest, AFileThatIsWrongIsLoggedAndNotUsedAndNotWrittenOver) {
   EXPECT_TRUE(set(eth0_, PROP_HOST_NAME, "x"));
 }
 
-TEST_F(OverlayTest, OnlyPropertiesThatCanBeSetMayStandInTheFile) {
+TEST_F(OverlayTest, OnlyPropertiesThatCanBeSetMayBeInTheFile) {
   for (const char* text : {R"({"/a": {"name": "x"}})", R"({"/a": {"enabled_state": 1}})", R"({"/a": {"nonsense": 1}})",
                            R"({"/a": []})", "[]", "", "{"}) {
     directory_.write("data/overlay.json", text);
@@ -277,7 +277,7 @@ TEST_F(OverlayTest, SettingTheSameValueAgainWritesNothing) {
   EXPECT_EQ(before.st_ino, after.st_ino);
 }
 
-// Each process looks before each write whether what it has written is still there: a value that the other one loses
+// Before each write, each process checks whether its earlier value is still there: a value that the other one loses
 // would not come back.
 TEST_F(OverlayTest, TwoProcessesThatWriteAThousandTimesEachLoseNothing) {
   constexpr int kWrites = 1000;

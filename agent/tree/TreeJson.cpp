@@ -58,7 +58,7 @@ constexpr std::array kOrigins{
     OriginName{AddressOrigin::LinkLocal, "link-local"},
 };
 
-// Where a value stands, for errors: the document and the keys that lead there, as in nodes[0].children[1].name.
+// The place of a value, for errors: the document and the keys that lead there, as in nodes[0].children[1].name.
 struct Place {
   const std::string& document;
   std::string key;
@@ -199,7 +199,7 @@ void readNode(const JsonValue& value, const Place& place, TreeBuilder& builder, 
   if (children != nullptr) readNodes(*children, place.member("children"), builder, node);
 }
 
-// The names of siblings, each with its place in their list, by name.
+// The names of siblings, each with its index in their list, by name.
 void refuseRepeatedNames(const std::vector<JsonValue>& siblings, const Place& place) {
   std::vector<std::pair<std::string_view, std::size_t>> names;
   for (std::size_t i = 0; i < siblings.size(); ++i) names.emplace_back(siblings[i].find("name")->text, i);

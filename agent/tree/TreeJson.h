@@ -1,5 +1,6 @@
-// The tree as a JSON document.
 #pragma once
+
+// The tree as a JSON document.
 
 #include <memory>
 #include <string>
@@ -12,17 +13,17 @@ namespace zorva::agent {
 
 JsonValue treeToJsonValue(const TreeSnapshot& tree);
 
-// Throws ConfigError, under that name and with line and key, for whatever the document should not have.
+/// Throws ConfigError, under that name and with line and key, for every error in the document.
 std::shared_ptr<const TreeSnapshot> treeFromJsonValue(const JsonValue& document, const std::string& name);
 
-// The name of a property in documents, such as "host_name"; null for a number that is no property.
+/// The name of a property in documents, such as "host_name"; null for a number that is no property.
 const char* propertyName(PropertyNumber number);
 
-// The property of that name, 0 where there is none.
+/// The property of that name, 0 if there is none.
 PropertyNumber propertyNumber(std::string_view name);
 
-// The value of a property, of the type that the property has. Throws ConfigError where it is of another; document and
-// key are what the error calls the place.
+/// The value of a property, of the property's type. Throws ConfigError if it is of another; document and key are its
+/// place in the error.
 PropertyValue propertyFromJson(PropertyNumber number, const JsonValue& value, const std::string& document,
                                const std::string& key);
 JsonValue propertyToJson(const PropertyValue& value);

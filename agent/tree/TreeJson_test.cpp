@@ -63,7 +63,7 @@ constexpr const char* kExample = R"({
 }
 )";
 
-// What is wrong with a document.
+// The error of a document.
 std::string wrong(const std::string& text) {
   try {
     treeFromJson(text, "tree.json");
@@ -74,7 +74,7 @@ std::string wrong(const std::string& text) {
   return "nothing";
 }
 
-// A document of one node, which has this besides type and name.
+// A document of one node, which has these members besides type and name.
 std::string nodeWith(const std::string& members) {
   return "{\"nodes\": [\n{\"type\": \"NetworkIPConfig\", \"name\": \"ip\",\n" + members + "}]}";
 }
@@ -129,7 +129,7 @@ TEST(TreeJson, EveryByteComesBackAsItWas) {
   }
 }
 
-TEST(TreeJson, CharactersOfThePrivatePlaneThatStandForBytesComeBackToo) {
+TEST(TreeJson, CharactersOfThePrivatePlaneThatMeanBytesAreReadBackToo) {
   const std::string name = "\xF4\x8E\xBB\xBF";  // U+10EEFF
   TreeBuilder builder(name);
   EXPECT_EQ(treeFromJson(treeToJson(*builder.finish()), "tree.json")->systemName(), name);
@@ -183,7 +183,7 @@ TEST(TreeJson, AMissingKeyIsNamed) {
   EXPECT_EQ(wrong("{\"nodes\": [\n{\"name\": \"x\"}]}"), "tree.json:2: nodes[0].type: is missing");
 }
 
-TEST(TreeJson, UnknownTypesAndNamesThatCannotStandInAPathAreNamed) {
+TEST(TreeJson, UnknownTypesAndNamesThatCannotBeInAPathAreNamed) {
   EXPECT_EQ(wrong(R"({"nodes": [{"type": "port", "name": "x"}]})"),
             "tree.json:1: nodes[0].type: expected \"System\", \"Port\" or \"NetworkIPConfig\"");
   EXPECT_EQ(wrong(R"({"nodes": [{"type": "Port", "name": "a/b"}]})"),
@@ -192,8 +192,8 @@ TEST(TreeJson, UnknownTypesAndNamesThatCannotStandInAPathAreNamed) {
             "tree.json:2: nodes[1].name: is the name of a sibling too");
 }
 
-TEST(TreeJson, AKeyThatStandsTwiceIsNamed) {
-  EXPECT_EQ(wrong("{\"nodes\": [],\n\"nodes\": []}"), "tree.json:1: nodes: stands twice in one object");
+TEST(TreeJson, AKeyThatOccursTwiceIsNamed) {
+  EXPECT_EQ(wrong("{\"nodes\": [],\n\"nodes\": []}"), "tree.json:1: nodes: is given twice in one object");
 }
 
 TEST(TreeJson, AddressesMustBeAddresses) {
@@ -213,10 +213,10 @@ TEST(TreeJson, AddressesMustBeAddresses) {
 }
 
 TEST(TreeJson, DeepDocumentsAreRefused) {
-  EXPECT_EQ(wrong(std::string(1000000, '[')), "tree.json:1: lists and objects stand more than 32 deep in one another");
+  EXPECT_EQ(wrong(std::string(1000000, '[')), "tree.json:1: lists and objects are nested more than 32 deep");
   std::string deep;
   for (int i = 0; i < 100000; ++i) deep += "{\"nodes\":";
-  EXPECT_EQ(wrong(deep), "tree.json:1: lists and objects stand more than 32 deep in one another");
+  EXPECT_EQ(wrong(deep), "tree.json:1: lists and objects are nested more than 32 deep");
 }
 
 TEST(TreeJson, ADocumentOfMillionsOfValuesIsRefused) {
@@ -233,7 +233,7 @@ TEST(FileSource, ReadsTheTreeAgainWhenTheFileChanges) {
   const TemporaryDirectory directory;
   FileSource source(directory.write("tree.json", R"({"system_name": "first"})"));
   EXPECT_TRUE(source.changed());
-  std::this_thread::sleep_for(std::chrono::milliseconds(20));  // past the tick in which the file was made
+  std::this_thread::sleep_for(std::chrono::milliseconds(20));  // after the tick in which the file was made
   EXPECT_EQ(source.read()->systemName(), "first");
   EXPECT_FALSE(source.changed());
   directory.write("tree.json", R"({"system_name": "second"})");

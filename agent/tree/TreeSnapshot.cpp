@@ -7,7 +7,7 @@ namespace zorva::agent {
 
 std::vector<const Node*> TreeSnapshot::children(const Node& node) const {
   std::vector<const Node*> result;
-  // Tree order: the subtree of a node ends where a node hangs at something before it.
+  // Tree order: the subtree of a node ends before the first node whose parent precedes the node.
   for (std::size_t i = node.index() + 1; i < nodes_.size() && nodes_[i].parentIndex() >= node.index(); ++i) {
     if (nodes_[i].parentIndex() == node.index()) result.push_back(&nodes_[i]);
   }
@@ -71,7 +71,7 @@ void TreeBuilder::set(std::size_t node, PropertyNumber number, PropertyValue val
     property.overlaid = overlaid;
     return;
   }
-  if (properties.capacity() == 0) properties.reserve(8);  // what a NetworkIPConfig node has
+  if (properties.capacity() == 0) properties.reserve(8);  // the properties of a NetworkIPConfig node
   properties.push_back(Property{number, std::move(value), overlaid});
 }
 

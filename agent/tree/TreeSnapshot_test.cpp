@@ -41,7 +41,7 @@ class SmallTree : public ::testing::Test {
   std::shared_ptr<const TreeSnapshot> tree_;
 };
 
-TEST_F(SmallTree, NodesStandInTreeOrder) {
+TEST_F(SmallTree, NodesAreInTreeOrder) {
   EXPECT_EQ(pathsOf(*tree_), (std::vector<std::string>{"/", "/system", "/system/eth1", "/system/eth1/ip",
                                                        "/system/eth0", "/system/eth0/ip", "/bmc"}));
 }
@@ -98,7 +98,7 @@ TEST_F(SmallTree, ACopyIsChangedWithoutTheOriginal) {
   EXPECT_EQ(pathsOf(*changed), pathsOf(*tree_));
 }
 
-TEST(TreeBuilder, NamesThatCouldNotStandInAPathAreRefused) {
+TEST(TreeBuilder, NamesThatCouldNotBeInAPathAreRefused) {
   TreeBuilder builder("host1");
   for (const std::string& name : {std::string(), std::string("a/b"), std::string("/"), std::string("a\0b", 3)}) {
     EXPECT_THROW(builder.add(0, NodeType::System, name), std::invalid_argument);
@@ -120,7 +120,7 @@ TEST(TreeBuilder, OneNameUnderTwoParentsIsFine) {
   EXPECT_NO_THROW(builder.finish());
 }
 
-TEST(TreeBuilder, ANodeCannotBeAddedBehindALaterBranch) {
+TEST(TreeBuilder, ANodeCannotBeAddedAfterALaterBranch) {
   TreeBuilder builder("host1");
   const std::size_t first = builder.add(0, NodeType::System, "a");
   builder.add(0, NodeType::System, "b");

@@ -1,5 +1,6 @@
-// Where a tree comes from.
 #pragma once
+
+// The source of a tree.
 
 #include <memory>
 
@@ -7,26 +8,26 @@
 
 namespace zorva::agent {
 
-// The agent calls a source from one thread at a time. What a source throws, beyond std::bad_alloc, should be derived
-// from std::exception with a what() of one line that tells what could not be read and why: it reaches the caller of
-// selectNode as it is.
+/// The agent calls a source from one thread at a time. Exceptions of a source, other than std::bad_alloc, should be
+/// derived from std::exception with a what() of one line that says what could not be read and why: the caller of
+/// selectNode gets them unchanged.
 class TreeSource {
  public:
   virtual ~TreeSource() = default;
 
-  // Whether what read() would give may differ from what it gave last. Never blocks. True before the first read, and
-  // where the source cannot tell.
+  /// Whether the next read() may differ from the last one. Never blocks. True before the first read, and if the source
+  /// cannot know.
   virtual bool changed() = 0;
 
-  // The tree as it is now; never null.
+  /// The current tree; never null.
   virtual std::shared_ptr<const TreeSnapshot> read() = 0;
 
-  // Called in a process that was forked from one that used this source: what the two would share, a socket with reports
-  // that are handed out only once, is closed here and opened anew.
+  /// Called in a process that was forked from one that used this source. Resources that the two would share, such as a
+  /// socket whose events are delivered only once, are closed here and opened again.
   virtual void reopen() {}
 };
 
-// A source whose tree is put into it.
+/// A source with a fixed tree.
 class FixedSource : public TreeSource {
  public:
   explicit FixedSource(std::shared_ptr<const TreeSnapshot> tree) : tree_(std::move(tree)) {}

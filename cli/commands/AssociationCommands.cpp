@@ -1,4 +1,5 @@
 // associators, associator-names, references, reference-names.
+
 #include <algorithm>
 
 #include "cli/commands/Commands.h"
@@ -41,8 +42,8 @@ void requireRole(const char* option, const std::string& role, const std::vector<
                 "there are " + joined(names, ", "));
 }
 
-/// The filter of the command line, its class names tested and in the schema's spelling. What the options of references
-/// call the result class is the association itself.
+/// The filter of the command line, with its class names checked and in the schema's spelling. The result class in the
+/// options of references is the association itself.
 broker::AssociationFilter filterOf(Session& session, const AssociationOptions& options) {
   const auto spelled = [&session](const std::string& name) {
     return name.empty() ? name : session.classNamed(name).name();
@@ -55,8 +56,7 @@ broker::AssociationFilter filterOf(Session& session, const AssociationOptions& o
   return filter;
 }
 
-/// Throws Failure where no association can be meant: CIM's answer would be the empty one, which looks like "there are
-/// none".
+/// Throws Failure if no association matches: CIM would answer with an empty result, which looks like "there are none".
 void requireAnAssociation(Session& session, const broker::ObjectPath& path, const broker::AssociationFilter& filter) {
   const schema::ClassRepository& classes = *session.classes();
   const schema::Class* source = classes.find(path.className);
@@ -76,12 +76,12 @@ void requireAnAssociation(Session& session, const broker::ObjectPath& path, cons
   requireRole("--result-role", filter.resultRole, associations);
 }
 
-/// One of the four operations, its results on their way to a writer.
+/// One of the four operations, which passes its results to a writer.
 using Operation = std::function<broker::Status(Operations& cim, const broker::ObjectPath& path,
                                                const broker::AssociationFilter& filter,
                                                const broker::Selection& selection, ResultWriter& writer)>;
 
-/// `top` is the class that the results are of, as the command line has it.
+/// `top` is the class of the results, from the command line.
 void follow(const Globals& globals, const AssociationOptions& options, Results results, const char* what,
             const std::string& top, const Operation& operation) {
   Session session(globals);
@@ -95,7 +95,7 @@ void follow(const Globals& globals, const AssociationOptions& options, Results r
   requireDone(std::string(what) + " of " + options.path, status);
 }
 
-template <class Result>
+template <typename Result>
 auto into(ResultWriter& writer) {
   return [&writer](const Result& result) {
     writer.add(result);
@@ -134,7 +134,7 @@ void showReferenceNames(const Globals& globals, const AssociationOptions& option
 void addFarEnd(Subcommand& subcommand, AssociationOptions& options) {
   subcommand.option("--assoc-class", "CLASS", "Only through this association", options.associationClass)
       .option("--result-class", "CLASS", "Only objects of this class", options.resultClass)
-      .option("--result-role", "ROLE", "Only where the far end stands at this reference", options.resultRole);
+      .option("--result-role", "ROLE", "Only where the far end is this reference", options.resultRole);
 }
 
 void addAssociation(Subcommand& subcommand, AssociationOptions& options) {
@@ -157,7 +157,7 @@ Subcommand addOne(CommandLine& line, const Naming& naming, Results results,
   subcommand.alias(naming.alias)
       .writes({OutputFormat::Table, OutputFormat::Json})
       .word("PATH", "The object path at the near end", options->path)
-      .option("--role", "ROLE", "Only where the near end stands at this reference", options->role);
+      .option("--role", "ROLE", "Only where the near end is this reference", options->role);
   addFilter(subcommand, *options);
   if (results == Results::Instances) {
     subcommand.writes({OutputFormat::Table, OutputFormat::Json, OutputFormat::Mof, OutputFormat::Xml})

@@ -1,4 +1,5 @@
 // modify, invoke.
+
 #include <algorithm>
 
 #include "cli/commands/Commands.h"
@@ -30,7 +31,7 @@ struct InvokeOptions {
   std::vector<std::string> values;  ///< "NAME=VALUE"
 };
 
-template <class Element>
+template <typename Element>
 std::string namesOf(const std::vector<Element>& elements) {
   std::vector<std::string> names;
   names.reserve(elements.size());

@@ -80,7 +80,7 @@ TEST(Modify, OfAnEndpointDoesNotSetWhatTheHostLeavesEmpty) {
   EXPECT_EQ(json::parse(done(host, {"overlay", "show", "-o", "json"})).size(), 1U);
 }
 
-TEST(Modify, FailsWhereThereIsNoFile) {
+TEST(Modify, FailsIfThereIsNoFile) {
   const TestHost host;
   const Outcome outcome = host.run({"modify", kSetting, "DomainName=lab.example.org"});
   EXPECT_EQ(outcome.exitCode, 1);
@@ -89,11 +89,11 @@ TEST(Modify, FailsWhereThereIsNoFile) {
   EXPECT_FALSE(std::filesystem::exists(host.dataFile("ifcfg-eth0")));
 }
 
-TEST(Modify, FailsWhereThereIsNoFileAlsoForAValueThatTheHostHasAnyway) {
+TEST(Modify, FailsIfThereIsNoFileEvenForAValueThatTheHostHas) {
   expectFailed(TestHost(), {"modify", kSetting, "DomainName=example.org"}, 1, "was not stored");
 }
 
-TEST_F(Changing, ModifyFailsWhereTheKeyIsMissing) {
+TEST_F(Changing, ModifyFailsIfTheKeyIsMissing) {
   host_.directory().write("data/ifcfg-eth0", "HOSTNAME=h\n");
   const Outcome outcome = host_.run({"modify", kSetting, "DomainName=lab.example.org", "RequestedHostname=new"});
   EXPECT_EQ(outcome.exitCode, 1);
@@ -104,7 +104,7 @@ TEST_F(Changing, ModifyFailsWhereTheKeyIsMissing) {
 
 TEST_F(Changing, ModifyIsRefusedToWhoMayNotWriteInTheDataDirectory) {
   ::chmod(host_.dataFile("ifcfg-eth0").c_str(), 0444);
-  const Outcome outcome = host_.runAsNobody({"modify", kSetting, "DomainName=lab.example.org"});
+  const Outcome outcome = host_.runUnprivileged({"modify", kSetting, "DomainName=lab.example.org"});
   if (outcome.exitCode == 127) GTEST_SKIP() << "another user cannot run what was built here";
   EXPECT_EQ(outcome.exitCode, 1);
   EXPECT_THAT(outcome.err, HasSubstr("settings.lock: cannot be opened: Permission denied"));
@@ -140,7 +140,7 @@ TEST(Modify, SaysThatTheDataDirectoryIsMissing) {
   }
 }
 
-TEST_F(Changing, ModifyHandsOnTheRefusalOfADomain) {
+TEST_F(Changing, ModifyPassesOnTheRefusalOfADomain) {
   expectFailed(host_, {"modify", kSetting, "RequestedHostname=good", "DomainName=bad name"}, 1,
                "CIM_ERR_INVALID_PARAMETER (4)");
   EXPECT_EQ(file(), wholeFileWith("HOSTNAME=host1", "HOSTNAME=good")) << "what came before it is written";
@@ -184,7 +184,7 @@ TEST_F(Changing, ModifyShowsNoLogLineOfAProvider) {
   EXPECT_THAT(host_.run({"modify", kSetting, "DomainName=bad..name"}).err, Not(HasSubstr("MESSAGE")));
 }
 
-TEST_F(Changing, AValueThatBeginsWithAHyphenGoesAfterTwoOfThem) {
+TEST_F(Changing, AValueThatBeginsWithAHyphenFollowsTwoOfThem) {
   done(host_, {"domain", "eth0", "--", "-x.example.org"});
   EXPECT_EQ(file(), wholeFileWith("DOMAINNAME=example.org", "DOMAINNAME=-x.example.org"));
   done(host_, {"suffixes", "set", "--", "--help", "-o"});
@@ -216,7 +216,7 @@ TEST(Invoke, NamesTheMethodsAndParametersThereAre) {
   expectFailed(TestHost(), {"cm", kEndpoint, "SetDNSDomain", "DNSDomain=a", "DNSDomain=b"}, 2, "takes one value");
 }
 
-TEST(Invoke, SaysWhatTheMethodTakesWhereItRefuses) {
+TEST(Invoke, SaysWhatTheMethodTakesIfItRefuses) {
   expectFailed(TestHost(), {"cm", kEndpoint, "SetDNSServerSearchOrder"}, 1,
                "\nzorvactl: SetDNSServerSearchOrder takes DNSServerSearchOrder (string, repeated)");
 }

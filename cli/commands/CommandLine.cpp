@@ -42,7 +42,7 @@ struct CommandLine::Registered {
   std::string footerOf(const CLI::App& subcommand) const;
   /// Those of all subcommands.
   void placeFooters(CLI::App& above) const;
-  /// What a word at a place of its own can be: a subcommand, an option, or the positional of that number.
+  /// The kind of a word at its position: a subcommand, an option, or the positional with that number.
   Completion completionAt(const CLI::App& at, std::size_t positional) const;
 };
 
@@ -61,7 +61,7 @@ std::vector<std::string> shownSubcommandsOf(const CLI::App& app) {
   return names;
 }
 
-/// "dns set": the words that call a subcommand.
+/// "dns set": the words of a subcommand.
 std::string callOf(const CLI::App& subcommand) {
   const CLI::App* parent = subcommand.get_parent();
   if (parent == nullptr) return {};
@@ -152,7 +152,7 @@ void addOnce(std::vector<std::string>& words, const std::string& word) {
   if (std::find(words.begin(), words.end(), word) == words.end()) words.push_back(word);
 }
 
-/// The error in words that name the subcommand, and where its usage is told.
+/// The error in words that name the subcommand, and how to show its usage.
 Telling wrongUsage(const CLI::App& app, const CLI::ParseError& error) {
   const CLI::App* at = &app;
   while (!at->get_subcommands().empty()) at = at->get_subcommands().back();
@@ -186,7 +186,7 @@ std::string CommandLine::Registered::footerOf(const CLI::App& subcommand) const 
   const std::vector<std::string> names = namesOf(formatsOf(subcommand));
   if (names.size() > 1) text += "\nIt writes " + joined(names, ", ") + " (--output).";
   return text +
-         "\nThe options of zorvactl itself may stand here as well: --url, --config, --log-level, --provider-dir.";
+         "\nThe options of zorvactl itself may be given here as well: --url, --config, --log-level, --provider-dir.";
 }
 
 void CommandLine::Registered::placeFooters(CLI::App& above) const {

@@ -1,5 +1,8 @@
 #pragma once
 
+// The command line: the subcommands register themselves with their words and options, which then are read from argv.
+// Help, completion and the errors of wrong usage are made of what is registered.
+
 #include <functional>
 #include <memory>
 #include <optional>
@@ -9,9 +12,6 @@
 #include <vector>
 
 #include "cli/session/Globals.h"
-
-// The command line: the subcommands register themselves with their words and options, which then are read from argv.
-// Help, completion and the errors of wrong usage are made of what is registered.
 
 namespace CLI {
 class App;
@@ -30,7 +30,7 @@ struct Telling {
   std::string hint = {};  ///< of an error: what to do next
 };
 
-/// What can stand at a place of the command line.
+/// The possible words at a place of the command line.
 struct Completion {
   std::vector<std::string> words;  ///< subcommands, options, or the values of an option
   /// What else can: "CLASS", "PATH", "INTERFACE", "METHOD", "PROPERTY", "ROLE", and with a "=" after them "PROPERTY="
@@ -85,7 +85,7 @@ class Subcommand {
   Subcommand& runs(Command command);
 
   /// The same with the options of its own, which the command line keeps alive.
-  template <class Options>
+  template <typename Options>
   Subcommand& runs(void (*command)(const Globals&, const Options&), std::shared_ptr<const Options> options) {
     return runs([command, options = std::move(options)](const Globals& globals) { command(globals, *options); });
   }

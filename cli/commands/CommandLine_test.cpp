@@ -161,7 +161,7 @@ TEST(Completion, OffersTheSubcommands) {
   EXPECT_THAT(completionAfter({"dns"}).words, IsSupersetOf({"show", "set", "add", "remove"}));
 }
 
-TEST(Completion, KnowsWhatAPlaceWants) {
+TEST(Completion, KnowsWhatAPlaceNeeds) {
   EXPECT_EQ(completionAfter({"ei"}).kind, "CLASS");
   EXPECT_EQ(completionAfter({"-o", "json", "gi"}).kind, "PATH");
   EXPECT_EQ(completionAfter({"dns", "set"}).kind, "INTERFACE");
@@ -181,7 +181,7 @@ TEST(CommandLine, NamesTheSubcommandThatIsNot) {
   EXPECT_EQ(tellingOf({"ei"}).hint, "zorvactl enumerate --help shows the usage");
 }
 
-TEST(CommandLine, WantsALevelThatIsANumber) {
+TEST(CommandLine, RequiresALevelThatIsANumber) {
   for (const char* word : {"x", "-1", "3000x", "", "99999999999"}) {
     EXPECT_THAT(tellingOf({"show", "--log-level", word}).text, HasSubstr("is no level")) << word;
   }

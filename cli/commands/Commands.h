@@ -1,9 +1,9 @@
 #pragma once
 
-#include "cli/commands/CommandLine.h"
-
 // The subcommands of zorvactl. Each function registers one of them, or a family, with its words and options; what it
 // does is in the source of the same name.
+
+#include "cli/commands/CommandLine.h"
 
 namespace zorva::cli {
 

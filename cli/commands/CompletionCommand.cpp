@@ -1,4 +1,5 @@
-// completion, and what its script asks.
+// completion, and the hidden command of its script.
+
 #include <algorithm>
 
 #include "cli/commands/Commands.h"
@@ -9,7 +10,7 @@ namespace zorva::cli {
 
 namespace {
 
-// Words are compared by this program, which knows the classes and interfaces; the shell shows what it prints.
+// This program compares the words, because it knows the classes and interfaces; the shell shows the printed ones.
 constexpr const char* kBashScript = R"(# Completion of zorvactl for bash: source <(zorvactl completion bash)
 _zorvactl() {
   local IFS=$'\n'
@@ -19,7 +20,7 @@ _zorvactl() {
 complete -o default -F _zorvactl zorvactl
 )";
 
-/// The words as they were typed: bash makes words of their own of "=" and ":".
+/// The words as they were typed: bash splits words at "=" and ":".
 std::vector<std::string> joinedWords(const std::vector<std::string>& words) {
   const auto isBreak = [](const std::string& word) { return word == "=" || word == ":"; };
   std::vector<std::string> out;
@@ -35,7 +36,7 @@ std::vector<std::string> joinedWords(const std::vector<std::string>& words) {
   return out;
 }
 
-/// The class that a path among the words names, the path being as it was typed, with the shell's quotes. Null: none.
+/// The class of a path among the words; the path is as typed, with the shell's quotes. Null: none.
 const schema::Class* classAmong(const schema::ClassRepository& classes, const std::vector<std::string>& words) {
   for (const std::string& word : words) {
     const std::size_t from = word.find_first_not_of("'\"");
@@ -56,7 +57,7 @@ void addRoles(const schema::ClassRepository& classes, const schema::Class& sourc
   }
 }
 
-/// What stands behind the name of a class: its methods, properties, the parameters of its methods, the roles at its
+/// The completions that depend on a class: its methods, properties, the parameters of its methods, the roles at its
 /// associations.
 void addNamesOf(const schema::ClassRepository& classes, const std::vector<std::string>& before,
                 Completion& completion) {
@@ -95,7 +96,7 @@ bool begins(const std::string& word, const std::string& begun) {
 Completion completionOf(const CommandLine& line, const Globals& globals, const std::vector<std::string>& before) {
   Completion completion = line.completionAfter(before);
   if (completion.kind == "INTERFACE") {
-    // Another host's are not known here.
+    // Those of another host are not known here.
     const bool isHere = std::none_of(before.begin(), before.end(), [](const std::string& word) {
       return word == "--url" || word.starts_with("--url=");
     });
@@ -119,13 +120,13 @@ void completeWords(const CommandLine& line, const Globals& globals, const std::v
   std::string begun = std::move(words.back());
   words.pop_back();
   if (const std::size_t equals = begun.find('='); equals != std::string::npos) {
-    // The value of an option; of what stands behind other "=" there is no list.
+    // The value of an option; there are no lists for the text after another "=".
     if (!begun.starts_with("--")) return;
     words.push_back(begun.substr(0, equals));
     begun.erase(0, equals + 1);
   }
   for (const std::string& word : completionOf(line, globals, words).words) {
-    // Options only where one is begun: there are more of them than of all else.
+    // Options only if the word begins like one: there are more of them than of all else.
     const bool isWanted = word.starts_with("-") == begun.starts_with("-");
     if (isWanted && begins(word, begun)) write(printable(word) + "\n");
   }
@@ -139,7 +140,7 @@ void addCompletionCommands(CommandLine& line) {
       .choice("SHELL", "bash", {"bash"})
       .runs(writeCompletion);
 
-  // For that script alone.
+  // For the completion script only.
   const auto words = std::make_shared<std::vector<std::string>>();
   line.add("complete", "")
       .hidden()

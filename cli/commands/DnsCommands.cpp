@@ -1,4 +1,5 @@
 // dns: the servers of an interface.
+
 #include <arpa/inet.h>
 #include <netinet/in.h>
 
@@ -10,7 +11,7 @@ namespace zorva::cli {
 
 namespace {
 
-/// An address in a form in which all spellings of one are the same.
+/// An address in a form that is equal for all its spellings.
 struct Address {
   int family = AF_UNSPEC;  ///< AF_UNSPEC: the text is no address
   std::string bytes;
@@ -19,7 +20,7 @@ struct Address {
   bool operator==(const Address&) const = default;
 };
 
-/// An address as inet_pton has it, with a zone after an IPv6 one or not.
+/// An address for inet_pton; an IPv6 one may have a zone.
 Address addressOf(const std::string& text) {
   const std::string address = text.substr(0, text.find('%'));
   const bool hasZone = address.size() < text.size();
@@ -72,7 +73,7 @@ void addDnsCommands(CommandLine& line) {
       .examples(
           "  zorvactl dns set eth0 192.0.2.53 2001:db8::53\n"
           "  zorvactl dns set eth0                         none at all");
-  addChange(dns, kServers, "add", "Add servers behind the others", Many::Some, addToList)
+  addChange(dns, kServers, "add", "Add servers after the others", Many::Some, addToList)
       .examples("  zorvactl dns add eth0 192.0.2.54");
   addChange(dns, kServers, "remove", "Remove servers", Many::Some, removeFromList)
       .examples("  zorvactl dns remove eth0 192.0.2.54");

@@ -36,7 +36,7 @@ TEST_F(Changing, DnsCommandsNameTheInterfacesThereAre) {
   expectFailed(host_, {"dns", "show", "eth7"}, 1, "interface eth7\nzorvactl: there are those of eth0, eth1");
 }
 
-TEST(Dns, FailsWhereThereIsNoFile) {
+TEST(Dns, FailsIfThereIsNoFile) {
   const Outcome outcome = TestHost().run({"dns", "set", "eth0", "192.0.2.1"});
   EXPECT_EQ(outcome.exitCode, 1);
   EXPECT_THAT(outcome.err, HasSubstr("'zorvactl ifcfg init eth0' makes it"));

@@ -1,4 +1,5 @@
 // domain, suffixes: the domain of an interface, and those that the host appends.
+
 #include <ProviderUtilities.h>
 
 #include "cli/commands/Commands.h"
@@ -11,7 +12,7 @@ namespace zorva::cli {
 
 namespace {
 
-/// As the providers judge it, for a server might, too.
+/// Checked as in the providers, because a server might check too.
 bool isName(const std::string& text) { return ZV::ProviderUtilities::ValidateInput(text, {}) != 0; }
 
 constexpr const char* kNameRule =
@@ -61,7 +62,7 @@ void addSuffixesCommands(CommandLine& line) {
   addShow(suffixes, kSuffixes).examples("  zorvactl suffixes show");
   addChange(suffixes, kSuffixes, "set", "Replace them; none at all empties the list", Many::Any, setList)
       .examples("  zorvactl suffixes set example.org example.net");
-  addChange(suffixes, kSuffixes, "add", "Add suffixes behind the others", Many::Some, addToList)
+  addChange(suffixes, kSuffixes, "add", "Add suffixes after the others", Many::Some, addToList)
       .examples("  zorvactl suffixes add lab.example.org");
   addChange(suffixes, kSuffixes, "remove", "Remove suffixes", Many::Some, removeFromList)
       .examples("  zorvactl suffixes remove lab.example.org");

@@ -17,7 +17,7 @@ namespace zorva::cli {
 
 namespace {
 
-/// A text that is the same for two paths of one object: host and namespace do not count, nor the order of the keys.
+/// A text that is equal for two paths of one object: host, namespace and the order of the keys do not count.
 std::string identity(const broker::ObjectPath& path) {
   broker::ObjectPath plain = path;
   plain.host.clear();
@@ -27,9 +27,10 @@ std::string identity(const broker::ObjectPath& path) {
   return shortPathText(plain);
 }
 
-// A host with up to this many objects is walked whole.
+// A host with up to this many objects is searched completely.
 constexpr std::size_t kManyObjects = 1000;
-// On a larger one this many objects are asked, times the number of all; two at least.
+// On a larger one, the number of queried objects times the number of all objects is at most this; at least two are
+// queried.
 constexpr std::size_t kMostWork = 100'000;
 
 class Walk {
@@ -47,7 +48,7 @@ class Walk {
 
  private:
   void visit(const broker::ObjectPath& root) {
-    if (graph_.notFollowed != 0) {  // it is not walked to its end
+    if (graph_.notFollowed != 0) {  // it was not searched completely
       graph_.notFollowed += places_.contains(identity(root)) ? 0 : 1;
       return;
     }
@@ -109,14 +110,14 @@ class Walk {
       found.push_back(each);
       return true;
     });
-    // Results may have come before a failure; what is missing then is told.
+    // Results may have arrived before a failure; the warning says that some are missing.
     if (!status.ok()) addProblem(problems_, objectLabel(path), statusText(status));
     atLeast_ = std::max(atLeast_, found.size());
     for (const broker::Instance& association : found) add(association);
   }
 
   void add(const broker::Instance& association) {
-    // A server says by it which profile an object conforms to. That is no part of the configuration.
+    // A server's association says which profile an object conforms to. That is not part of the configuration.
     if (util::sameName(association.path.className, "CIM_ElementConformsToProfile")) return;
     std::vector<GraphEnd> ends;
     for (const broker::Property& property : association.properties) {
@@ -134,7 +135,7 @@ class Walk {
   Session& session_;
   Progress& progress_;
   const bool followsAll_;
-  std::size_t atLeast_;  // at least so many objects there are
+  std::size_t atLeast_;  // the number of known objects
   std::size_t followed_ = 0;
   Graph graph_;
   std::vector<Problem> problems_;
@@ -144,8 +145,8 @@ class Walk {
   std::deque<std::size_t> open_;
 };
 
-/// The lines of a tree: an object, under it its associations, each with its far end. An object stands under the one
-/// from which the fewest steps lead to it.
+/// The lines of a tree: an object, below it its associations, each with its far end. An object is below the one from
+/// which the fewest steps lead to it.
 class TreeWriter {
  public:
   TreeWriter(const Graph& graph, const Layout& layout)
@@ -183,7 +184,7 @@ class TreeWriter {
     return association.from.object == object ? association.to : association.from;
   }
 
-  /// For each object the link that leads to it first; gives the objects to which none does.
+  /// For each object the link that leads to it first; returns the objects without such a link.
   std::vector<std::size_t> findWays() {
     std::vector<std::size_t> roots;
     std::vector<bool> reached(graph_.objects.size());
@@ -205,7 +206,7 @@ class TreeWriter {
     return roots;
   }
 
-  // A stack of its own: the tree may be as deep as the host has objects.
+  // Uses its own stack, because the tree may be as deep as the host has objects.
   void writeTree(std::size_t root) {
     written_[root] = true;
     out_ += styled(printable(shortPathText(graph_.objects[root].path)), Style::Heading, layout_) + "\n";
@@ -243,7 +244,7 @@ class TreeWriter {
   const Graph& graph_;
   Layout layout_;
   std::vector<std::vector<std::size_t>> links_;  // of each object
-  std::vector<std::size_t> wayTo_;               // kNone for roots and for what cannot be fetched
+  std::vector<std::size_t> wayTo_;               // kNone for roots and for objects that cannot be fetched
   std::vector<bool> written_;
   std::vector<bool> told_;
   std::string out_;

@@ -1,4 +1,5 @@
 // graph.
+
 #include <fcntl.h>
 #include <spawn.h>
 #include <sys/wait.h>

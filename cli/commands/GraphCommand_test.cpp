@@ -53,7 +53,7 @@ TEST(Graph, ShowsWhatIsThereWithoutTheCompanionLibrary) {
   }
 }
 
-TEST(Graph, FailsWhereNothingCanBeAsked) {
+TEST(Graph, FailsIfNothingCanBeAsked) {
   expectRefused(TestHost(), {"graph", "--provider-dir", "/nowhere"}, 1, "no class could be asked: ");
 }
 
@@ -70,7 +70,7 @@ TEST(Graph, SaysWhatToInstallForAPicture) {
   EXPECT_THAT(without.err, HasSubstr("apt-get install graphviz"));
 }
 
-// The program that stands for Graphviz's dot shows that it gets the graph, and that what it writes is the output.
+// The replacement for Graphviz's dot shows that it gets the graph, and that its output is passed on.
 TEST(Graph, IsDrawnByDot) {
   const TestHost host;
   const std::string dot = host.directory().write(

@@ -13,7 +13,7 @@ GraphObject object(const std::string& name, const std::string& problem = {}) {
   return {{"h", "root/cimv2", "C", {{"Name", broker::Value::text(name)}}}, problem};
 }
 
-/// a - b - c, c - a, and b to something that is not there.
+/// a - b - c, c - a, and b to an object that does not exist.
 Graph ring() {
   Graph graph;
   graph.objects = {object("a"), object("b"), object("c"), {{"h", "root/cimv2", "D", {}}, "it has no keys"}};
@@ -83,7 +83,7 @@ TEST(GraphDot, HasAnEdgeForEachAssociation) {
   EXPECT_THAT(dot, HasSubstr(R"(o3 [label="D", style=dashed, tooltip="it has no keys"];)"));
 }
 
-TEST(ObjectLabel, IsTheClassAndTheKeyThatTellsInstancesApart) {
+TEST(ObjectLabel, IsTheClassAndTheKeyThatIdentifiesInstances) {
   EXPECT_EQ(objectLabel({"", "", "C", {{"SystemName", broker::Value::text("h")}, {"Name", broker::Value::text("n")}}}),
             "C n");
   EXPECT_EQ(objectLabel({"", "", "C", {{"InstanceID", broker::Value::text("i")}}}), "C i");

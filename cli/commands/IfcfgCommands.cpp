@@ -1,4 +1,5 @@
 // ifcfg init, ifcfg show.
+
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -38,7 +39,7 @@ std::string settingTable(const std::vector<SettingLine>& lines, const Layout& la
   return table.text(layout);
 }
 
-/// A fresh installation has no data directory yet. One of another name that is missing is more likely misspelt.
+/// A fresh installation has no data directory yet. A missing one with another name is probably misspelt.
 void makeDefaultDirectory() {
   const std::string directory = zorva::agent::dataDirectory();
   if (directory != zorva::agent::kDefaultDataDir || ::geteuid() != 0) return;

@@ -29,9 +29,9 @@ TEST(IfcfgInit, ChangesNothingThatTheProvidersSay) {
   EXPECT_EQ(done(host, {"ei", "CIM_SettingData", "-o", "json"}), before);
 }
 
-TEST_F(Changing, IfcfgInitReplacesAFileOnlyWhenTold) {
+TEST_F(Changing, IfcfgInitReplacesAFileOnlyOnRequest) {
   host_.directory().write("data/ifcfg-eth0", "HOSTNAME=mine\n");
-  expectFailed(host_, {"ifcfg", "init", "eth0"}, 1, "stands already\nzorvactl: --force puts a new file in its place");
+  expectFailed(host_, {"ifcfg", "init", "eth0"}, 1, "exists already\nzorvactl: --force puts a new file in its place");
   EXPECT_EQ(file(), "HOSTNAME=mine\n");
   done(host_, {"ifcfg", "init", "eth0", "--force"});
   EXPECT_EQ(file(), kWholeFile);
@@ -83,8 +83,8 @@ TEST(IfcfgShow, MarksTheLinesThatAreMissing) {
   expectFailed(host, {"ifcfg", "show", "eth1"}, 1, "No such file or directory\nzorvactl: zorvactl ifcfg init makes it");
 }
 
-TEST_F(Changing, IfcfgInitTellsWhereItMayNotWrite) {
-  const Outcome outcome = host_.runAsNobody({"ifcfg", "init", "eth1"});
+TEST_F(Changing, IfcfgInitReportsIfItMayNotWrite) {
+  const Outcome outcome = host_.runUnprivileged({"ifcfg", "init", "eth1"});
   if (outcome.exitCode == 127) GTEST_SKIP() << "another user cannot run what was built here";
   EXPECT_EQ(outcome.exitCode, 1);
   EXPECT_THAT(outcome.err, HasSubstr("nothing was changed: " + host_.dataFile("settings.lock") +

@@ -1,4 +1,5 @@
 // overlay show, overlay clear.
+
 #include <algorithm>
 #include <optional>
 
@@ -55,7 +56,7 @@ void clearOverlay(const Globals& globals, const std::string& name) {
 }  // namespace
 
 void addOverlayCommands(CommandLine& line) {
-  Subcommand overlay = line.add("overlay", "Values that were set and stand in for the host's own");
+  Subcommand overlay = line.add("overlay", "Values that were set and replace the host's own");
   overlay.writes({OutputFormat::Table, OutputFormat::Json})
       .examples("  zorvactl overlay show\n  zorvactl overlay clear eth0");
 

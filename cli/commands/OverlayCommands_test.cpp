@@ -24,7 +24,7 @@ TEST_F(Changing, OverlayClearGivesBackWhatTheHostSays) {
   EXPECT_THAT(host_.run({"overlay", "show"}).err, HasSubstr("note: no value is set"));
 }
 
-TEST_F(Changing, OverlayThatIsWrongIsToldAndCanBeCleared) {
+TEST_F(Changing, OverlayThatIsWrongIsReportedAndCanBeCleared) {
   host_.directory().write("data/overlay.json", "{\n{");
   expectFailed(host_, {"overlay", "show"}, 2, "overlay.json:2: ");
   EXPECT_EQ(host_.run({"overlay", "clear"}).exitCode, 0);

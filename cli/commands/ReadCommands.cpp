@@ -1,4 +1,5 @@
 // enumerate, names, get.
+
 #include "broker/Broker.h"
 #include "cli/commands/Commands.h"
 #include "cli/output/Failure.h"

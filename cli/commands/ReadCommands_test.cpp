@@ -42,7 +42,7 @@ TEST(Enumerate, GivesTypedJson) {
   EXPECT_EQ(found[0]["properties"]["DNSSuffixesToAppend"], (json{"example.org", "example.net"}));
 }
 
-TEST(Enumerate, GivesAnEmptyListWhereThereIsNothing) {
+TEST(Enumerate, GivesAnEmptyListIfThereIsNothing) {
   EXPECT_EQ(shown(TestHost(), {"ei", "ZORVA_SPComputerSystem", "-o", "json"}), "[]\n");
   EXPECT_EQ(shown(TestHost(), {"ei", "ZORVA_SPComputerSystem"}), "");
 }
@@ -78,7 +78,7 @@ TEST(Enumerate, SaysWhichClassesAreLikeOneThatIsNot) {
   expectRefused(TestHost(), {"ei", "Frob"}, 2, "there is no class Frob\nzorvactl: zorvactl classes lists them\n");
 }
 
-TEST(Enumerate, TellsOfAProviderThatIsMissing) {
+TEST(Enumerate, ReportsAMissingProvider) {
   const TestHost host;
   const Outcome outcome = host.run({"ei", "ZORVA_DNSProtocolEndPoint", "-o", "json", "--provider-dir", "/nowhere"});
   EXPECT_EQ(outcome.exitCode, 1);
@@ -103,19 +103,19 @@ TEST(Get, FindsAnAssociationByAPartOfItsReferences) {
   EXPECT_THAT(found["properties"]["ManagedElement"].get<std::string>(), HasSubstr("eth1"));
 }
 
-TEST(Get, ListsTheCandidatesWhereThereAreSeveral) {
+TEST(Get, ListsTheCandidatesIfThereAreSeveral) {
   expectRefused(TestHost(), {"gi", "ZORVA_DNSSettingData"}, 2,
                 "2 instances fit ZORVA_DNSSettingData\nzorvactl: give more of the keys of one of them:\n"
                 "  ZORVA_DNSSettingData.InstanceID=\"Computer%eth0\"\n"
                 "  ZORVA_DNSSettingData.InstanceID=\"Computer%eth1\"\n");
 }
 
-TEST(Get, ListsWhatThereIsWhereNothingFits) {
+TEST(Get, ListsTheInstancesIfNothingFits) {
   expectRefused(TestHost(), {"gi", R"(ZORVA_DNSProtocolEndPoint.Name="eth9")"}, 1,
                 "there is no instance ZORVA_DNSProtocolEndPoint.Name=\"eth9\"\nzorvactl: there are:\n");
 }
 
-TEST(Get, TellsTheCodeOfAnInstanceThatIsNotThere) {
+TEST(Get, ReportsTheCodeOfAMissingInstance) {
   expectRefused(TestHost(), {"gi", R"(ZORVA_DNSSettingData.InstanceID="nothing")"}, 1, "CIM_ERR_NOT_FOUND (6)");
 }
 

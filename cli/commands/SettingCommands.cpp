@@ -1,4 +1,5 @@
-// dns, domain, suffixes: what a person wants to type, made of the CIM operations.
+// dns, domain, suffixes: short commands for people, made of CIM operations.
+
 #include <ProviderUtilities.h>
 #include <arpa/inet.h>
 #include <netinet/in.h>
@@ -25,8 +26,8 @@ namespace {
 constexpr const char* kServers = "DNSServerAddresses";
 constexpr const char* kSuffixes = "DNSSuffixesToAppend";
 
-/// The settings of an interface. Where the host and its service processor have one of the same name, the host's: both
-/// would be kept in the same file.
+/// The settings of an interface. If the host and its service processor have one of the same name, the host's: both use
+/// the same file.
 broker::Instance settingOfInterface(Session& session, const std::string& interface) {
   const std::vector<broker::Instance> all = instancesOf(session, kSettingClass);
   const broker::Instance* found = nullptr;
@@ -82,16 +83,16 @@ void requireReadable(const Arguments& arguments, const char* subcommand) {
   requireFormat(arguments.output, {OutputFormat::Table, OutputFormat::Json}, subcommand);
 }
 
-/// An address in a form in which all spellings of one are the same.
+/// An address in a form that is equal for all its spellings.
 struct Address {
   int family = AF_UNSPEC;  ///< AF_UNSPEC: the text is no address
   std::string bytes;
-  std::string zone;  ///< what follows "%" after an IPv6 address
+  std::string zone;  ///< the text after "%" in an IPv6 address
 
   bool operator==(const Address&) const = default;
 };
 
-/// An address as inet_pton has it, with a zone after an IPv6 one or not.
+/// An address for inet_pton; an IPv6 one may have a zone.
 Address addressOf(const std::string& text) {
   const std::string address = text.substr(0, text.find('%'));
   const bool hasZone = address.size() < text.size();
@@ -129,7 +130,7 @@ void requireServer(const std::string& text) {
   if (isUnspecified(address)) throw refused(text, "is the unspecified address; no server has it");
 }
 
-/// As the providers judge it, for a server might, too.
+/// Checked as in the providers, because a server might check too.
 bool isName(const std::string& text) { return ZV::ProviderUtilities::ValidateInput(text, {}) != 0; }
 
 constexpr const char* kNameRule =
@@ -156,7 +157,7 @@ bool isAmong(const std::string& text, const std::vector<std::string>& texts, Sam
   return std::any_of(texts.begin(), texts.end(), [&](const std::string& each) { return same(each, text); });
 }
 
-/// Each word by itself, and none twice.
+/// Checks each word, and that none is given twice.
 void requireEach(const std::vector<std::string>& words, void (*require)(const std::string& word), Same same) {
   std::vector<std::string> before;
   for (const std::string& word : words) {

@@ -34,7 +34,7 @@ bool isAmong(const std::string& text, const std::vector<std::string>& texts, Sam
   return std::any_of(texts.begin(), texts.end(), [&](const std::string& each) { return same(each, text); });
 }
 
-/// Each word by itself, and none twice.
+/// Checks each word, and that none is given twice.
 void requireEach(const std::vector<std::string>& words, void (*require)(const std::string& word), Same same) {
   std::vector<std::string> before;
   for (const std::string& word : words) {
@@ -74,7 +74,7 @@ broker::Instance settingOf(Session& session, const ListSetting& setting, const S
 }
 
 /// Changes the list to what `changed` makes of it, with nobody else changing it meanwhile.
-template <class Changed>
+template <typename Changed>
 void changeList(const ListSetting& setting, const Globals& globals, const SettingOptions& options, Changed changed) {
   Session session(globals);
   const Session::Changing alone(session, options.dryRun);

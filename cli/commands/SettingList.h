@@ -1,5 +1,7 @@
 #pragma once
 
+// What dns, domain and suffixes share: settings read, changed and written, and lists among them.
+
 #include <string>
 #include <string_view>
 #include <vector>
@@ -9,8 +11,6 @@
 #include "cli/output/Failure.h"
 #include "cli/session/Globals.h"
 #include "cli/session/Session.h"
-
-// What dns, domain and suffixes share: settings read, changed and written, and lists among them.
 
 namespace zorva::cli {
 

@@ -1,4 +1,5 @@
 // show, classes.
+
 #include <string>
 
 #include "cli/commands/Commands.h"

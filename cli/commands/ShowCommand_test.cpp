@@ -31,7 +31,7 @@ TEST(Show, ListsServersInSearchOrderAndNotByName) {
                                      {"order": 3, "address": "::1"}])"));
 }
 
-TEST(Show, TellsWhereEachSettingComesFrom) {
+TEST(Show, SaysWhereEachSettingComesFrom) {
   const TestHost host;
   host.directory().write("data/ifcfg-eth1", "HOSTNAME=fromfile\n");
   std::map<std::string, json> settings;
@@ -72,14 +72,14 @@ TEST(Show, HasADashWhereAProviderIsMissing) {
   EXPECT_THAT(outcome.err, HasSubstr("libzorvadnsclientprofileprovider"));
 }
 
-TEST(Classes, TellOnceOfALibraryThatIsMissing) {
+TEST(Classes, ReportAMissingLibraryOnce) {
   const Outcome outcome = TestHost().run({"classes", "--provider-dir", "/nowhere"});
   EXPECT_EQ(outcome.exitCode, 0);
   EXPECT_EQ(std::count(outcome.err.begin(), outcome.err.end(), '\n'), 2) << outcome.err;
   EXPECT_THAT(outcome.err, HasSubstr("warning: ZORVA_ComputerSystem, ZORVA_SPComputerSystem, "));
 }
 
-TEST(Show, TellsOfValuesThatWereSet) {
+TEST(Show, ReportsValuesThatWereSet) {
   const TestHost host;
   shown(host, {"modify", kEth0, "DomainName=set.example"});
   EXPECT_THAT(shown(host, {"show"}), HasSubstr("DomainName          set.example              set\n"));

@@ -1,4 +1,5 @@
 // tree.
+
 #include <string>
 #include <vector>
 

@@ -55,7 +55,7 @@ Json ofSetting(const SettingRow& row, bool hasSources) {
   return entry;
 }
 
-template <class Row, class Convert>
+template <typename Row, typename Convert>
 Json ofRows(const std::vector<Row>& rows, Convert convert) {
   Json list = Json::array();
   for (const Row& row : rows) list.push_back(convert(row));

@@ -1,5 +1,8 @@
 #pragma once
 
+// JSON documents (RFC 8259) of the views that commands make of what they read; laid out as those of
+// output/JsonOutput.h.
+
 #include <string>
 #include <vector>
 
@@ -8,12 +11,9 @@
 #include "cli/session/HostView.h"
 #include "cli/session/SettingFile.h"
 
-// JSON documents (RFC 8259) of the views that commands make of what they read; laid out as those of
-// output/JsonOutput.h.
-
 namespace zorva::cli {
 
-/// What `show` shows.
+/// The result of `show`.
 std::string hostViewJson(const HostView& view);
 
 /// The path and the lines of an interface's file: "file" and "lines", each with "key" and "value".
@@ -22,8 +22,8 @@ std::string settingFileJson(const std::string& path, const std::vector<SettingLi
 /// The values of the overlay: "node", "property", "value".
 std::string overlayJson(const std::vector<OverlayRow>& rows);
 
-/// "objects", each with "path" and, where it cannot be fetched, "problem"; "associations" with their class and the
-/// places of their ends in the list of objects.
+/// "objects", each with "path" and, if it cannot be fetched, "problem"; "associations" with their class and the indices
+/// of their ends in the list of objects.
 std::string graphJson(const Graph& graph);
 
 /// The rows of `classes`.

@@ -28,7 +28,7 @@ std::size_t takeBody(char* data, std::size_t size, std::size_t count, void* repl
 std::size_t takeField(char* data, std::size_t size, std::size_t count, void* reply) {
   auto& fields = static_cast<HttpReply*>(reply)->fields;
   const std::string_view line(data, size * count);
-  // A further status line stands for a new set of fields: "100 Continue" came before.
+  // Another status line begins a new set of fields: "100 Continue" came before.
   if (line.starts_with("HTTP/")) fields.clear();
   const std::size_t colon = line.find(':');
   if (colon == std::string_view::npos || fields.size() >= 1000) return size * count;
@@ -39,21 +39,21 @@ std::size_t takeField(char* data, std::size_t size, std::size_t count, void* rep
 
 }  // namespace
 
-/// The functions of libcurl that are used, and a transfer.
+/// The used functions of libcurl, and a transfer.
 struct HttpClient::Curl {
   Curl();
   ~Curl();
   Curl(const Curl&) = delete;
   Curl& operator=(const Curl&) = delete;
 
-  template <class Function>
+  template <typename Function>
   void find(Function& function, const char* name) {
     function = reinterpret_cast<Function>(::dlsym(library, name));
     if (function != nullptr) return;
     throw Failure(ExitCode::Failed, std::string("libcurl has no function ") + name);
   }
 
-  template <class Value>
+  template <typename Value>
   void set(CURLoption option, Value value) {
     const CURLcode code = setopt(easy, option, value);
     if (code != CURLE_OK) throw Failure(ExitCode::Failed, std::string("libcurl refused an option: ") + strerror(code));
@@ -69,7 +69,7 @@ struct HttpClient::Curl {
   decltype(&::curl_slist_append) append = nullptr;
   decltype(&::curl_slist_free_all) freeAll = nullptr;
   CURL* easy = nullptr;
-  char problem[CURL_ERROR_SIZE] = {};  ///< of the last transfer, in more words than its code has
+  char problem[CURL_ERROR_SIZE] = {};  ///< of the last transfer, more detailed than its code
 };
 
 HttpClient::Curl::Curl() : library(::dlopen("libcurl.so.4", RTLD_NOW | RTLD_LOCAL)) {
@@ -94,7 +94,7 @@ HttpClient::Curl::Curl() : library(::dlopen("libcurl.so.4", RTLD_NOW | RTLD_LOCA
 
 HttpClient::Curl::~Curl() {
   if (easy != nullptr) cleanup(easy);
-  // The library stays: what it depends on may not bear being unloaded.
+  // The library stays loaded: its dependencies may not support unloading.
 }
 
 HttpClient::HttpClient(const ServerUrl& server) : curl_(std::make_unique<Curl>()), server_(server) {
@@ -122,7 +122,7 @@ HttpReply HttpClient::post(const std::vector<std::string>& fields, const std::st
   for (const std::string& field : fields) {
     curl_slist* const longer = curl_->append(list.get(), field.c_str());
     if (longer == nullptr) throw std::bad_alloc();
-    (void)list.release();  // it is in the longer one now
+    (void)list.release();  // the longer list owns it now
     list.reset(longer);
   }
   curl_->set(CURLOPT_HTTPHEADER, list.get());

@@ -1,15 +1,15 @@
 #pragma once
 
+// The CIM operations done by the providers in this process.
+
 #include "cli/operations/Operations.h"
 #include "frontend/ReadBack.h"
-
-// The CIM operations done by the providers in this process.
 
 namespace zorva::cli {
 
 class LocalOperations : public Operations {
  public:
-  /// The providers are loaded when they are first asked.
+  /// A provider is loaded when it is first used.
   LocalOperations(std::shared_ptr<const schema::ClassRepository> classes, broker::BrokerOptions options)
       : broker_(std::move(classes), std::move(options)) {}
 
@@ -24,7 +24,7 @@ class LocalOperations : public Operations {
   broker::Status getInstance(const broker::ObjectPath& path, const broker::Selection& selection,
                              broker::Instance& instance) override {
     const broker::Status status = broker_.getInstance(path, selection, instance);
-    // As it was asked for, whatever order the provider has.
+    // In the order of the request, not the provider's.
     if (status.ok()) instance.path.keys = path.keys;
     return status;
   }

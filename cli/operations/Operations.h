@@ -1,5 +1,8 @@
 #pragma once
 
+// The CIM operations (DSP0200) for the subcommands, executed by the providers in this process or by a server. Used by
+// one thread.
+
 #include <optional>
 #include <string>
 #include <string_view>
@@ -7,25 +10,23 @@
 
 #include "broker/Broker.h"
 
-// The CIM operations (DSP0200) that the subcommands are made of, wherever they are done: by the providers in this
-// process, or by a server. Used by one thread.
-
 namespace zorva::cli {
 
 class Operations {
  public:
   virtual ~Operations() = default;
 
-  /// As the Broker's functions of the same names do it. An empty namespace is the usual one of whoever answers. What a
-  /// sink is given holds until it returns. A status that is no success may also tell that nobody could be asked.
+  /// Like the Broker's functions of the same names. An empty namespace means the usual one of the provider or server.
+  /// Arguments of a sink are valid until it returns. A failure may also mean that no provider or server could be
+  /// reached.
   virtual broker::Status enumerateInstances(std::string_view nameSpace, std::string_view className,
                                             const broker::Selection& selection, const broker::InstanceSink& sink) = 0;
   virtual broker::Status enumerateInstanceNames(std::string_view nameSpace, std::string_view className,
                                                 const broker::PathSink& sink) = 0;
-  /// The instance gets the keys that were asked for, all of them.
+  /// The instance has all the keys of the request.
   virtual broker::Status getInstance(const broker::ObjectPath& path, const broker::Selection& selection,
                                      broker::Instance& instance) = 0;
-  /// Here, the providers' success is checked by reading again; a server may do so or not.
+  /// Here, success is checked by reading again; a server may do so or not.
   virtual broker::Status modifyInstance(const broker::Instance& instance,
                                         const std::optional<std::vector<std::string>>& propertyList) = 0;
   virtual broker::Status associators(const broker::ObjectPath& path, const broker::AssociationFilter& filter,
@@ -39,13 +40,13 @@ class Operations {
   virtual broker::Status invokeMethod(const broker::ObjectPath& path, std::string_view method,
                                       const std::vector<broker::NamedValue>& input, broker::MethodResult& result) = 0;
 
-  /// The path with names in the schema's spelling, key values in the schema's types and the namespace that counts.
+  /// The path with names in the schema's spelling, key values in the schema's types and its namespace.
   virtual broker::Status canonicalPath(const broker::ObjectPath& path, broker::ObjectPath& canonical) = 0;
 
-  /// The class of that name, in any case; null where there is none.
+  /// The class of that name, in any case; null if there is none.
   virtual const schema::Class* classNamed(std::string_view name) = 0;
 
-  /// The classes of the DNS client profile and its companions, with who provides them where that is known.
+  /// The classes of the DNS client profile and its companions, with their providers if known.
   virtual const std::vector<broker::ProviderEntry>& served() const = 0;
 };
 

@@ -1,5 +1,7 @@
 #pragma once
 
+// The CIM operations on a server: CIM-XML over HTTP (DSP0200 1.4).
+
 #include <map>
 #include <memory>
 #include <string>
@@ -10,15 +12,12 @@
 #include "cli/operations/ServerUrl.h"
 #include "util/Names.h"
 
-// The CIM operations asked of a server: CIM-XML over HTTP (DSP0200 1.4).
-
 namespace zorva::cli {
 
 class RemoteOperations : public Operations {
  public:
-  /// Connects when it is first asked. `classes` are those that are known beforehand; others are asked for. Throws
-  /// Failure where the URL is wrong or libcurl cannot be loaded. The operations throw Failure where the server gives no
-  /// answer, or none that is CIM-XML.
+  /// Connects at the first operation. `classes` are known in advance; others are requested. Throws Failure if the URL
+  /// is wrong or libcurl cannot be loaded. The operations throw Failure if the server does not answer with CIM-XML.
   RemoteOperations(std::string_view url, std::shared_ptr<const schema::ClassRepository> classes);
   ~RemoteOperations() override;
 
@@ -56,7 +55,7 @@ class RemoteOperations : public Operations {
   std::shared_ptr<const schema::ClassRepository> classes_;
   broker::ProviderRegistry served_;
   HttpClient http_;
-  /// Classes that were asked for, each with a repository of its own; null: the server has none of that name.
+  /// Requested classes, each with its own repository; null: the server has none of that name.
   std::map<std::string, std::unique_ptr<schema::ClassRepository>, util::NameLess> fetched_;
 };
 

@@ -11,7 +11,7 @@ namespace zorva::cli {
 
 namespace {
 
-/// The text may hold a password, so it is not shown again.
+/// The text may contain a password, so it is not repeated.
 Failure wrongUrl(const std::string& why) {
   return {ExitCode::WrongUsage, "--url: " + why, "it looks like http://localhost:5988/root/cimv2"};
 }
@@ -28,7 +28,7 @@ bool isPort(std::string_view text) noexcept {
   return error == std::errc() && end == text.data() + text.size() && port > 0 && port <= 65535;
 }
 
-/// Takes "host", "host:port" or "[address]:port" apart.
+/// Splits "host", "host:port" or "[address]:port".
 void readHost(std::string_view text, ServerUrl& url) {
   const bool isBracketed = text.starts_with('[');
   const std::size_t close = isBracketed ? text.find(']') : std::min(text.find(':'), text.size());
@@ -41,7 +41,7 @@ void readHost(std::string_view text, ServerUrl& url) {
   url.host = isBracketed ? "[" + std::string(host) + "]" : std::string(host);
   if (rest.empty()) return;
   if (!rest.starts_with(':') || !isPort(rest.substr(1))) {
-    throw wrongUrl("'" + printable(rest) + "' behind the host is no port");
+    throw wrongUrl("'" + printable(rest) + "' after the host is no port");
   }
   url.port = rest.substr(1);
 }

@@ -43,7 +43,7 @@ TEST(ServerUrl, IsRefusedWhereAPartIsWrong) {
   }
 }
 
-TEST(ServerUrl, IsNotShownWhereItIsWrongSinceItMayHoldAPassword) {
+TEST(ServerUrl, IsNotShownInErrorsBecauseItMayContainAPassword) {
   try {
     readServerUrl("http://user:secret@a b/");
     FAIL();

@@ -1,5 +1,7 @@
 #pragma once
 
+// How a command ends if it fails.
+
 #include <stdexcept>
 #include <string>
 #include <string_view>
@@ -7,15 +9,13 @@
 
 #include "broker/objects/Value.h"
 
-// How a command ends when it cannot do what it was asked.
-
 namespace zorva::cli {
 
-/// What the process gives back to the shell.
+/// The exit status of the process.
 enum class ExitCode { Done = 0, Failed = 1, WrongUsage = 2 };
 
-/// Thrown to end a command. what() names what went wrong and where; `hint` says what to do next and may be empty. Both
-/// are shown as they stand, line feeds included: texts from elsewhere go through printable() first.
+/// Thrown to end a command. what() names the error and its place; `hint` says what to do next and may be empty. Both
+/// are shown unchanged, line feeds included: texts from elsewhere must go through printable() first.
 class Failure : public std::runtime_error {
  public:
   Failure(ExitCode exitCode, const std::string& message, std::string hint = {})
@@ -29,13 +29,14 @@ class Failure : public std::runtime_error {
   std::string hint_;
 };
 
-/// "CIM_ERR_NOT_FOUND (6): no such instance": the code with its name, and the text of who answered, made printable.
+/// "CIM_ERR_NOT_FOUND (6): no such instance": the code with its name, and the text of the provider or server, made
+/// printable.
 std::string statusText(const broker::Status& status);
 
-/// The failure of a CIM operation: what was tried, the code with its name, the provider's or broker's text.
+/// The failure of a CIM operation: the operation, the code with its name, the provider's or broker's text.
 Failure operationFailure(std::string_view operation, const broker::Status& status, std::string hint = {});
 
-/// Throws operationFailure where the status is one.
+/// Throws operationFailure if the status is a failure.
 void requireDone(std::string_view operation, const broker::Status& status);
 
 }  // namespace zorva::cli

@@ -1,25 +1,24 @@
 #pragma once
 
+// JSON documents (RFC 8259) of what CIM operations give. Each text is indented by two blanks and has no line feed at
+// its end. Bytes that are no UTF-8 come out as asUtf8() has them.
+
 #include <cstddef>
 #include <string>
 #include <vector>
 
 #include "broker/Broker.h"
 
-// JSON documents (RFC 8259) of what CIM operations give. Each text is indented by two blanks and has no line feed at
-// its end. Bytes that are no UTF-8 come out as asUtf8() has them.
-
 namespace zorva::cli {
 
-/// An instance as an object: "class", "path", and "properties" in the order in which they were set; a property that is
-/// null is null, a reference is the text of its path. `depth` is by how many blanks the lines after the first are
-/// shifted.
+/// An instance as an object: "class", "path", and "properties" in the order in which they were set. A null property is
+/// null, a reference is the text of its path. `depth` is the indent in blanks of the lines after the first.
 std::string instanceJson(const broker::Instance& instance, std::size_t depth);
 
 /// A path's text as a JSON string.
 std::string pathJson(const broker::ObjectPath& path);
 
-/// What a method gave back: "return_value" and "output".
+/// The result of a method: "return_value" and "output".
 std::string methodResultJson(const broker::MethodResult& result);
 
 /// A list of texts.

@@ -14,7 +14,7 @@ struct MofScalar {
     return asUtf8(broker::pathText(*path));
   }
   schema::Scalar operator()(const broker::Boxed<broker::Instance>& instance) const { return instanceMof(*instance); }
-  template <class Plain>
+  template <typename Plain>
   schema::Scalar operator()(const Plain& plain) const {
     return plain;
   }

@@ -11,7 +11,7 @@ enum class OutputFormat { Table, Json, Mof, Xml, Dot, Svg };
 inline constexpr OutputFormat kAllFormats[] = {OutputFormat::Table, OutputFormat::Json, OutputFormat::Mof,
                                                OutputFormat::Xml,   OutputFormat::Dot,  OutputFormat::Svg};
 
-/// The option's word for a format: "json".
+/// The option's value for a format: "json".
 const char* formatName(OutputFormat format) noexcept;
 
 /// The format of that word; nothing where there is none.

@@ -1,4 +1,5 @@
 // JSON, MOF and the text of the tree.
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 

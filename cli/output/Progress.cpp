@@ -73,7 +73,7 @@ void Progress::run() {
 void Progress::show() {
   clear();
   if (what_.empty()) return;
-  // A line that is wrapped could not be taken away again.
+  // A wrapped line could not be erased.
   writeToTerminal((what_ + " ...").substr(0, widthOfTerminal() - 1));
   shown_ = what_;
 }

@@ -8,8 +8,8 @@
 
 namespace zorva::cli {
 
-/// A line on standard error that says what a long command is doing: on a terminal alone, from half a second on, gone
-/// again at the end. One at a time.
+/// A line on standard error that says what a long command is doing: only on a terminal, only after half a second, and
+/// erased at the end. One at a time.
 class Progress {
  public:
   Progress();
@@ -17,10 +17,10 @@ class Progress {
   Progress(const Progress&) = delete;
   Progress& operator=(const Progress&) = delete;
 
-  /// What is being done from now on: "counting ZORVA_DNSSettingData".
+  /// The current step: "counting ZORVA_DNSSettingData".
   void step(std::string what);
 
-  /// Takes the line away until the next step, if one is shown, so that something else can be written.
+  /// Erases the line, if one is shown, until the next step, so that something else can be written.
   static void makeRoom();
 
  private:
@@ -31,9 +31,9 @@ class Progress {
   std::mutex mutex_;
   std::condition_variable ends_;
   std::string what_;
-  std::string shown_;  // empty: no line is there
+  std::string shown_;  ///< empty: no line is shown
   bool isOver_ = false;
-  std::thread thread_;  // none where standard error is no terminal
+  std::thread thread_;  ///< none if standard error is no terminal
 };
 
 }  // namespace zorva::cli

@@ -74,7 +74,7 @@ class MofWriter : public ResultWriter {
   bool any_ = false;
 };
 
-/// A declaration document: instances with their paths, which any CIM-XML reader can take.
+/// A declaration document: instances with their paths, which any CIM-XML reader accepts.
 class XmlWriter : public ResultWriter {
  public:
   void add(const broker::Instance& instance) override {

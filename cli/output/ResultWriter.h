@@ -1,13 +1,13 @@
 #pragma once
 
+// Writes the results of a CIM operation to standard output, in the requested format. Results are written one by one, so
+// that their number is not limited by memory.
+
 #include <memory>
 
 #include "broker/objects/Value.h"
 #include "cli/output/OutputFormat.h"
 #include "cli/output/Table.h"
-
-// What a CIM operation gives, on standard output, in the format that was asked for. Results go out one by one, so that
-// any number of them fits into memory.
 
 namespace zorva::cli {
 
@@ -17,24 +17,24 @@ class ResultWriter {
   virtual void add(const broker::Instance& instance) = 0;
   virtual void add(const broker::ObjectPath& /*path*/) {}
 
-  /// Completes the text; also after a failure, so that what came before it can be read by a program.
+  /// Completes the text, also after a failure, so that a program can read the results before it.
   virtual void finish() {}
 };
 
-/// How many results there are: One is written as it is, Many as a list.
+/// The number of results: One is written alone, Many as a list.
 enum class Count { One, Many };
 
 enum class Results { Instances, Names };
 
 /// Table: names one a line, instances as their names with their properties under them.
-/// Json (RFC 8259): a name is a text; an instance {"class", "path", "properties"}, where null is a property that is
-/// null, and a reference is a text. Many are an array.
+/// Json (RFC 8259): a name is a text; an instance is {"class", "path", "properties"}, with null for a null property and
+/// a text for a reference. Many are an array.
 /// Mof (DSP0004): instance declarations.
 /// Xml (DSP0201): one declaration document of the instances with their paths.
-/// Throws Failure (wrong usage) for a format that these results cannot have.
+/// Throws Failure (wrong usage) for a format that does not exist for these results.
 std::unique_ptr<ResultWriter> makeResultWriter(OutputFormat format, const Layout& layout, Count count, Results results);
 
-/// Throws Failure (wrong usage) that names what `subcommand` can write unless `format` is among it.
+/// Throws Failure (wrong usage) that lists the formats of `subcommand`, unless `format` is one of them.
 void requireFormat(OutputFormat format, std::initializer_list<OutputFormat> allowed, const char* subcommand);
 
 }  // namespace zorva::cli

@@ -15,7 +15,7 @@ namespace zorva::cli {
 namespace {
 
 constexpr std::size_t kGap = 2;        // blanks between columns
-constexpr std::size_t kNarrowest = 8;  // no column gets narrower for want of room
+constexpr std::size_t kNarrowest = 8;  // no column is made narrower than this
 
 const char* escapeOf(Style style) noexcept {
   switch (style) {
@@ -59,7 +59,7 @@ void appendRow(std::string& out, const std::vector<Cell>& row, const std::vector
     for (std::size_t i = 0; i < columns.size(); ++i) {
       std::string_view piece = line < columns[i].size() ? std::string_view(columns[i][line]) : std::string_view();
       piece = piece.substr(0, piece.find_last_not_of(' ') + 1);
-      // Blanks go out only before the next text, so that no line ends in them.
+      // Blanks are written only before the next text, so that no line ends in them.
       if (!piece.empty()) out += blanks + styled(piece, row[i].style, layout);
       if (!piece.empty()) blanks.clear();
       blanks.append(widths[i] + kGap - std::min(widths[i], displayWidth(piece)), ' ');
@@ -108,7 +108,7 @@ std::vector<std::size_t> Table::columnWidths(const Layout& layout) const {
   while (total > layout.width) {
     const auto widest = std::max_element(widths.begin(), widths.end());
     if (*widest <= kNarrowest) break;
-    // Down to the next widest column at once, so that a text of a megabyte takes few rounds.
+    // Down to the next widest column at once, so that even a text of a megabyte takes few rounds.
     std::size_t next = kNarrowest;
     for (auto width = widths.begin(); width != widths.end(); ++width) {
       if (width != widest && *width < *widest) next = std::max(next, *width);

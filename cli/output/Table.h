@@ -1,15 +1,15 @@
 #pragma once
 
+// Tables with aligned columns, for terminals of any width.
+
 #include <cstddef>
 #include <string>
 #include <string_view>
 #include <vector>
 
-// Tables that line up, on terminals of any width.
-
 namespace zorva::cli {
 
-/// What a text looks like where colours are shown.
+/// The look of a text if colours are shown.
 enum class Style { Plain, Heading, Good, Warning, Bad, Faint };
 
 /// How text is laid out.
@@ -17,12 +17,12 @@ struct Layout {
   std::size_t width = 0;  ///< columns of the terminal; 0: no terminal, so no limit
   bool colours = false;
 
-  /// That of standard output: colours and a width only where it is a terminal, no colours where NO_COLOR is set and not
-  /// empty or the terminal is a dumb one.
+  /// The layout of standard output: colours and a width only if it is a terminal; no colours if NO_COLOR is set and not
+  /// empty, or the terminal is a dumb one.
   static Layout ofStandardOutput();
 };
 
-/// `text` between the terminal's escape sequences for `style`; as it is where the layout has no colours.
+/// `text` between the terminal's escape sequences for `style`; unchanged if the layout has no colours.
 std::string styled(std::string_view text, Style style, const Layout& layout);
 
 /// One field of a table. The text is made printable by the table.
@@ -35,8 +35,8 @@ struct Cell {
   Cell(const char* content) : text(content) {}  // NOLINT(google-explicit-constructor)
 };
 
-/// Rows of fields under headings. Columns are as wide as their widest field; where that is too much for the terminal,
-/// the widest columns are narrowed and their fields go over several lines, so nothing is lost.
+/// Rows of fields below headings. Columns are as wide as their widest field. If that is too much for the terminal, the
+/// widest columns are narrowed and their fields wrapped, so no text is lost.
 class Table {
  public:
   /// Without headings there is no line for them.

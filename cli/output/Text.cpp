@@ -11,8 +11,8 @@ namespace zorva::cli {
 
 namespace {
 
-/// Characters that a terminal obeys instead of showing them: C0 and C1 controls, and those that turn the direction of
-/// the text or break its line.
+/// Characters that control a terminal instead of being shown: C0 and C1 controls, and those that change the direction
+/// of the text or break its line.
 bool steersTerminal(std::uint32_t code) noexcept {
   return code < 0x20 || (code >= 0x7F && code < 0xA0) || code == 0x061C || (code >= 0x200B && code <= 0x200F) ||
          (code >= 0x2028 && code <= 0x202E) || (code >= 0x2060 && code <= 0x206F) || code == 0xFEFF ||

@@ -1,29 +1,29 @@
 #pragma once
 
+// Text for a terminal. Interface names, DNS names and provider messages come from elsewhere and may contain any bytes;
+// a terminal must not get control characters from them.
+
 #include <cstddef>
 #include <string>
 #include <string_view>
 #include <vector>
 
-// Text on its way to a terminal. Interface names, DNS names and provider messages come from elsewhere and may hold any
-// bytes; a terminal must get none that steer it.
-
 namespace zorva::cli {
 
-/// `text` with what is no printable character made visible: \n, \t, \x1B for control characters and for bytes that are
-/// no UTF-8, \u202E for characters that change the direction or the lines of what follows. Well-formed UTF-8 for any
-/// bytes.
+/// `text` with unprintable characters made visible: \n, \t, \x1B for control characters and for bytes that are not
+/// UTF-8, \u202E for characters that change the direction or the lines of the following text. The result is well-formed
+/// UTF-8 for any bytes.
 std::string printable(std::string_view text);
 
-/// The columns that a printable text takes on a terminal: two for East Asian wide characters, none for combining ones.
+/// The columns of a printable text on a terminal: two for East Asian wide characters, none for combining ones.
 std::size_t displayWidth(std::string_view text);
 
-/// Cuts a printable text into lines of at most `width` columns, at blanks where there are some. One line at least; a
-/// character wider than `width` has a line of its own. `width` 0 means no limit.
+/// Cuts a printable text into lines of at most `width` columns, at blanks if possible. One line at least; a character
+/// wider than `width` has its own line. `width` 0 means no limit.
 std::vector<std::string> wrapped(std::string_view text, std::size_t width);
 
-/// `text` for a document that must be UTF-8: a byte that is none stands as the character U+10EE00 plus the byte, as in
-/// the agent's own documents.
+/// `text` for a document that must be UTF-8: an invalid byte becomes the character U+10EE00 plus the byte, as in the
+/// agent's own documents.
 std::string asUtf8(std::string_view text);
 
 /// The texts with `separator` between them.

@@ -8,8 +8,8 @@
 
 namespace zorva::cli {
 
-/// The instrumentation tree as lines: each node under its parent, a property of a node a line of its own under it. A
-/// value that was set and stands in for the host's own is marked.
+/// The instrumentation tree as lines: each node below its parent, and each property of a node on a line below it. A
+/// value that was set and replaces the host's own is marked.
 std::string treeText(const zorva::agent::TreeSnapshot& tree, const Layout& layout);
 
 /// A value that was set through the agent, for display.

@@ -28,7 +28,7 @@ struct ScalarText {
   std::string operator()(const broker::Boxed<broker::Instance>& value) const { return shortPathText(value->path); }
 };
 
-/// A bound of a ValueMap entry; `open` is what stands for none.
+/// A bound of a ValueMap entry; `open` is the value of a missing one.
 std::optional<std::int64_t> bound(std::string_view text, std::int64_t open) {
   if (text.empty()) return open;
   const bool isHex = text.starts_with("0x") || text.starts_with("0X");
@@ -39,8 +39,8 @@ std::optional<std::int64_t> bound(std::string_view text, std::int64_t open) {
   return number;
 }
 
-/// True where a ValueMap entry ("7", "11..32767", "0x8000..") holds the number; ".." alone is what no other entry
-/// holds.
+/// True if a ValueMap entry ("7", "11..32767", "0x8000..") contains the number; ".." alone contains all numbers that no
+/// other entry has.
 bool holds(std::string_view entry, std::int64_t number) {
   if (entry.empty() || entry == "..") return false;
   const std::size_t dots = entry.find("..");

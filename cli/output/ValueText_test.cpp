@@ -15,7 +15,7 @@ const schema::ClassProperty& propertyOf(const char* className, const char* prope
   return *classes->find(className)->findProperty(property);
 }
 
-TEST(ValueText, HasTheSchemasWordBehindANumber) {
+TEST(ValueText, HasTheSchemasWordAfterANumber) {
   const auto& state = propertyOf("ZORVA_DNSProtocolEndPoint", "EnabledState");
   EXPECT_EQ(valueText(Value::unsignedNumber(2, schema::Type::Uint16), &state), "2 (Enabled)");
   EXPECT_EQ(valueText(Value::unsignedNumber(40000, schema::Type::Uint16), &state), "40000 (Vendor Reserved)");
@@ -30,14 +30,14 @@ TEST(ValueText, FindsOpenRangesOfNumbers) {
   EXPECT_EQ(valueWord(status, 5), std::nullopt) << "\"..\" is what no other entry holds, and says nothing of a number";
 }
 
-TEST(ValueText, HasTheWordBehindEachElementOfAnArray) {
+TEST(ValueText, HasTheWordAfterEachElementOfAnArray) {
   const auto& status = propertyOf("ZORVA_ComputerSystem", "OperationalStatus");
   EXPECT_EQ(
       valueText(Value::array(schema::Type::Uint16, {Scalar(std::uint64_t{2}), Scalar(std::uint64_t{3})}), &status),
       "2 (OK), 3 (Degraded)");
 }
 
-TEST(ValueText, TellsNullFromEmpty) {
+TEST(ValueText, DistinguishesNullFromEmpty) {
   EXPECT_EQ(valueText(Value::null(schema::Type::String), nullptr), "NULL");
   EXPECT_EQ(valueText(Value::text(""), nullptr), "");
   EXPECT_EQ(valueText(Value::textArray({}), nullptr), "");

@@ -15,7 +15,7 @@ namespace {
 
 constexpr std::size_t kShownText = 60;
 
-/// The text for an error, not longer than a line.
+/// The text for an error, at most one line.
 std::string quoted(std::string_view text) {
   const bool isLong = text.size() > kShownText;
   return "'" + printable(text.substr(0, isLong ? util::utf8Cut(text, kShownText) : text.size())) +
@@ -26,7 +26,7 @@ Failure wrongValue(const TypedName& declared, std::string_view text, const std::
   return {ExitCode::WrongUsage, declared.name + "=" + quoted(text) + ": " + why};
 }
 
-template <class Number>
+template <typename Number>
 broker::Scalar parseNumber(const TypedName& declared, std::string_view text) {
   const bool isNegative = text.starts_with('-');
   std::string digits(text.substr(isNegative ? 1 : 0));
@@ -68,7 +68,7 @@ broker::Scalar parseCharacter(const TypedName& declared, std::string_view text) 
   return static_cast<char16_t>(util::utf8Decode(text));
 }
 
-/// Tests that the value is within what its type can hold.
+/// Checks that the value fits in its type.
 void requireFitting(const TypedName& declared, std::string_view text, const broker::Scalar& scalar) {
   schema::Value value;
   if (const auto* number = std::get_if<std::uint64_t>(&scalar)) value = schema::Value::of(*number);

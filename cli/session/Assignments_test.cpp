@@ -16,7 +16,7 @@ Value valueOf(Type type, const std::vector<std::string>& texts, bool isArray = f
   return parseValue({"P", type, isArray}, texts);
 }
 
-/// The message with which a value is refused; empty where it is taken.
+/// The message with which a value is refused; empty if it is accepted.
 std::string refusal(Type type, const std::vector<std::string>& texts, bool isArray = false) {
   try {
     valueOf(type, texts, isArray);
@@ -56,7 +56,7 @@ TEST(ParseValue, ReadsAReferenceAsAPath) {
   EXPECT_THAT(refusal(Type::Reference, {R"(C.K="v)"}), HasSubstr("the path is wrong at byte 5"));
 }
 
-TEST(ParseValue, TellsNullFromTheEmptyTextAndTheEmptyArray) {
+TEST(ParseValue, DistinguishesNullFromTheEmptyTextAndTheEmptyArray) {
   EXPECT_TRUE(valueOf(Type::String, {"null"}).isNull);
   EXPECT_EQ(valueOf(Type::String, {""}), Value::text(""));
   EXPECT_TRUE(valueOf(Type::String, {"null"}, true).isNull);

@@ -1,5 +1,7 @@
 #include "cli/session/Change.h"
 
+#include <cmpidt.h>
+
 #include <algorithm>
 #include <optional>
 
@@ -9,7 +11,6 @@
 #include "cli/output/Text.h"
 #include "cli/output/ValueText.h"
 #include "cli/session/HostView.h"
-#include "cmpidt.h"
 #include "frontend/ReadBack.h"
 #include "frontend/SettingPlace.h"
 #include "util/Names.h"
@@ -20,7 +21,7 @@ namespace {
 
 bool isEmpty(const broker::Value& value) { return broker::hasSameEffect(value, broker::Value::null(value.type)); }
 
-/// Why a server says that it was done, and it was not.
+/// Why a server reports success although nothing was stored.
 std::string reasonThere(const broker::Instance& now, const broker::Property& change) {
   if (change.value.isNull) return frontend::reasonOnThisHost(now, change);
   const char* key = frontend::settingKey(now.path.className, change.name);
@@ -34,8 +35,8 @@ broker::Instance instanceToSend(const broker::Instance& found, const std::vector
   broker::Instance sent;
   sent.path = found.path;
   sent.declaration = found.declaration;
-  // What the endpoint's provider gets is stored, also an empty text where the host says nothing; that would hide what
-  // the host says later.
+  // The endpoint's provider stores every value, even an empty text if the host has none; that would hide a later value
+  // of the host.
   const bool storesAll = found.path.className == kEndpointClass;
   for (const broker::Property& property : found.properties) {
     const bool isChanged = std::any_of(changes.begin(), changes.end(), [&](const broker::Property& change) {
@@ -57,7 +58,7 @@ broker::Instance fetched(Session& session, const broker::ObjectPath& path) {
   return instance;
 }
 
-/// A failure where there is no file to hold a change: then it is so only because the host says so, too.
+/// A failure if there is no file for a change: then the value is equal only because the host has it too.
 broker::Status checkFiles(const broker::Instance& now, const std::vector<broker::Property>& wanted) {
   std::vector<frontend::LostChange> lost;
   for (const broker::Property& change : wanted) {
@@ -95,7 +96,7 @@ broker::Instance changeInstance(Session& session, const broker::ObjectPath& path
   }
   requireModified(found.path, session.cim().modifyInstance(sent, propertyList));
   broker::Instance now = fetched(session, found.path);
-  // Here it has been checked already, before anybody else could change it.
+  // Local changes have been checked already, under the same lock.
   requireModified(found.path,
                   session.isRemote() ? frontend::checkChanges(now, changes, reasonThere) : checkFiles(now, changes));
   return now;
@@ -110,7 +111,7 @@ void writeChanges(const Session& session, const broker::Instance& instance,
       table.add({property.name, valueText(property.value, property.declaration)});
     }
   } else {
-    // An empty list comes back as null.
+    // An empty list is returned as null.
     for (const broker::Property& change : changes) {
       const broker::Value* value = instance.property(change.name);
       const bool isNull = value == nullptr || value->isNull;

@@ -56,7 +56,7 @@ bool fileStands(const std::string& interface) {
 struct SettingName {
   const char* property;
   bool isList;
-  zorva::agent::PropertyNumber number;  ///< of the host's value; kNoNumber: it has no place but the file
+  zorva::agent::PropertyNumber number;  ///< of the host's value; kNoNumber: it is only in the file
 };
 
 constexpr zorva::agent::PropertyNumber kNoNumber = 0;
@@ -72,13 +72,13 @@ constexpr SettingName kHostSettings[] = {
     {"ConfigurationName", false, kNoNumber},
 };
 
-/// Where the settings of an interface come from.
+/// The source of an interface's settings.
 struct Origin {
   std::string interface;
-  const zorva::agent::Node* node = nullptr;  ///< null: it is not in the tree
+  const zorva::agent::Node* node = nullptr;  ///< null: not in the tree
 };
 
-/// The file alone decides: where it stands, a key that it lacks is an empty value and not the host's.
+/// Only the file counts if it exists: a key that it lacks is an empty value and not the host's.
 SettingSource sourceOf(const Origin& origin, zorva::agent::PropertyNumber number, bool hasValue) {
   if (fileStands(origin.interface)) return SettingSource::File;
   if (number == kNoNumber || !hasValue) return SettingSource::None;
@@ -86,7 +86,7 @@ SettingSource sourceOf(const Origin& origin, zorva::agent::PropertyNumber number
   return property != nullptr && property->overlaid ? SettingSource::Set : SettingSource::Host;
 }
 
-/// The configurations of a tree by the names of their interfaces; of several with one name the first.
+/// The configurations of a tree by the names of their interfaces; the first of several with one name.
 class Configurations {
  public:
   explicit Configurations(const zorva::agent::TreeSnapshot& tree) {
@@ -98,7 +98,7 @@ class Configurations {
     }
   }
 
-  /// Null where there is none.
+  /// Null if there is none.
   const zorva::agent::Node* find(const std::string& interface, bool isServiceProcessor) const {
     const auto found = byName_.find({isServiceProcessor, interface});
     return found == byName_.end() ? nullptr : found->second;
@@ -123,7 +123,7 @@ void addSettings(std::vector<SettingRow>& rows, const SettingName (&names)[Size]
   }
 }
 
-/// The instances of a class, as far as they can be had; where they cannot, the view tells why.
+/// The instances of a class; if they cannot be read, the view says why.
 std::vector<broker::Instance> askedFor(Session& session, const char* className, HostView& view) {
   std::vector<broker::Instance> instances;
   const broker::Status status = session.cim().enumerateInstances({}, className, {}, [&](const broker::Instance& each) {
@@ -162,7 +162,7 @@ void readSettings(Session& session, HostView& view) {
   }
 }
 
-/// A server's host is what its computer systems say, the host itself first and not its service processor.
+/// The name of a server's host is that of its computer systems: the host itself first, not its service processor.
 std::string systemNameOf(Session& session, HostView& view) {
   if (!session.isRemote()) {
     const std::string& configured = zorva::agent::currentConfig().systemName;
@@ -210,7 +210,7 @@ std::vector<broker::Instance> instancesOf(Session& session, std::string_view cla
 
 namespace {
 
-// Above this number of instances of one class the associations are not counted without being asked for.
+// Above this number of instances of one class the associations are only counted on request.
 constexpr std::uint64_t kManyInstances = 500;
 
 ClassRow emptyRow(const Session& session, const broker::ProviderEntry& entry) {
@@ -224,7 +224,7 @@ ClassRow emptyRow(const Session& session, const broker::ProviderEntry& entry) {
 
 void count(Session& session, ClassRow& row) {
   std::uint64_t count = 0;
-  // Instances of subclasses are counted at their own class.
+  // Instances of subclasses are counted for their own class.
   const broker::Status status = session.cim().enumerateInstanceNames({}, row.name, [&](const broker::ObjectPath& path) {
     count += path.className == row.name ? 1 : 0;
     return true;

@@ -1,5 +1,7 @@
 #pragma once
 
+// The first view for a person: the DNS client configuration of the host, read from the providers.
+
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -9,8 +11,6 @@
 #include "cli/session/Session.h"
 #include "frontend/SettingsClaims.h"
 
-// What a person reads first: the DNS client configuration of the host in one view, asked of the providers.
-
 namespace zorva::cli {
 
 using frontend::kEndpointClass;
@@ -19,8 +19,8 @@ using frontend::kSettingClass;
 inline constexpr const char* kServerClass = "ZORVA_RemoteServiceAccessPoint";
 inline constexpr const char* kSystemClass = "ZORVA_ComputerSystem";
 
-/// Where the value of a setting comes from: the interface's file, the host, a value that was set and stands in for the
-/// host's own, or nowhere.
+/// The source of a setting's value: the interface's file, the host, a value that was set and replaces the host's own,
+/// or none.
 enum class SettingSource { File, Host, Set, None };
 
 const char* sourceName(SettingSource source) noexcept;
@@ -41,7 +41,7 @@ struct ServerRow {
 };
 
 struct SettingRow {
-  std::string interface;  ///< whose file and host settings count
+  std::string interface;  ///< the interface whose file and host settings count
   std::string setting;    ///< the property's name
   bool isList = false;
   std::vector<std::string> values;
@@ -50,13 +50,13 @@ struct SettingRow {
 
 struct ClassRow {
   std::string name;
-  std::string provider;  ///< the prefix of its create functions; empty: not known, as with a server's
+  std::string provider;  ///< the prefix of its create functions; empty: not known, for example with a server
   std::string library;
-  std::optional<std::uint64_t> count;  ///< absent: the provider cannot be asked, or that would take too long
-  std::string problem;                 ///< why it cannot be asked
+  std::optional<std::uint64_t> count;  ///< absent: the provider cannot be queried, or that would take too long
+  std::string problem;                 ///< why it cannot be queried
 };
 
-/// Why some classes, or the associations of some objects, could not be asked.
+/// Why some classes, or the associations of some objects, could not be queried.
 struct Problem {
   std::vector<std::string> names;
   std::string what;
@@ -69,41 +69,40 @@ struct HostView {
   std::vector<SettingRow> interfaceSettings;
   std::vector<SettingRow> hostSettings;
   std::vector<ClassRow> classes;
-  bool hasSources = true;         ///< false: the settings' sources are not known, as with a server's
-  std::vector<Problem> problems;  ///< what could not be asked; its part of the view is empty
+  bool hasSources = true;         ///< false: the settings' sources are not known, for example with a server
+  std::vector<Problem> problems;  ///< the failed queries; their parts of the view are empty
 
   bool couldAsk(std::string_view className) const;
 };
 
-/// Adds a name to those with that reason.
+/// Adds a name to the names with that reason.
 void addProblem(std::vector<Problem>& problems, const std::string& name, const std::string& what);
 
-/// The classes that could not be asked, those with the same reason together.
+/// The classes that could not be queried, grouped by reason.
 std::vector<Problem> problemsOf(const std::vector<ClassRow>& rows);
 
 /// "ZORVA_A, ZORVA_B: CIM_ERR_FAILED (1): no library"; of many names the first ones and how many more.
 std::string problemText(const Problem& problem);
 
-/// Asks the providers. What one of them does not answer is left empty and told in `problems`. Endpoints and settings
+/// Queries the providers. A part that cannot be read is left empty and reported in `problems`. Endpoints and settings
 /// are in the order of their names.
 HostView readHostView(Session& session, Progress& progress, bool countsAll);
 
-/// The classes that the registry knows, with their instances counted. To count an association may take the square of
-/// the time that its ends take; where those are very many, that is done only if `countsAll`.
+/// The classes of the registry, with their instances counted. Counting an association may take the square of the time
+/// of its ends; if those are very many, that is done only if `countsAll`.
 std::vector<ClassRow> readClassRows(Session& session, Progress& progress, bool countsAll);
 
 /// Whether some class was not counted because that would take too long.
 bool isUncounted(const std::vector<ClassRow>& rows);
 
-/// The instances of a class. Throws Failure where they cannot be had.
+/// The instances of a class. Throws Failure if they cannot be read.
 std::vector<broker::Instance> instancesOf(Session& session, std::string_view className);
 
-/// The interface whose settings an instance of ZORVA_DNSSettingData tells: what stands behind the "%" of its
-/// InstanceID.
+/// The interface of an instance of ZORVA_DNSSettingData: the text after the "%" of its InstanceID.
 std::string interfaceOfSetting(const broker::Instance& setting);
 
-/// The interface whose file holds the settings of the host as a whole: that of the first configuration outside a
-/// service processor. Nothing where there is none, and with a server, which does not say.
+/// The interface whose file has the settings of the host as a whole: that of the first configuration outside a service
+/// processor. Nothing if there is none, and with a server, which does not say.
 std::optional<std::string> interfaceOfHostSettings(const Session& session);
 
 }  // namespace zorva::cli

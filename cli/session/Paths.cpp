@@ -17,7 +17,7 @@ constexpr std::size_t kListedCandidates = 20;
 
 bool continuesCharacter(char c) noexcept { return (static_cast<unsigned char>(c) & 0xC0U) == 0x80; }
 
-/// The text around a place, and a line with a mark under that place.
+/// The text around a place, and a line with a mark below that place.
 std::string markedPlace(std::string_view text, std::size_t position) {
   position = std::min(position, text.size());
   std::size_t from = position > kShownBefore ? position - kShownBefore : 0;
@@ -25,8 +25,8 @@ std::string markedPlace(std::string_view text, std::size_t position) {
   while (from > 0 && continuesCharacter(text[from])) --from;
   while (to < text.size() && continuesCharacter(text[to])) ++to;
   const std::string before = (from > 0 ? "..." : "") + printable(text.substr(from, position - from));
-  const std::string behind = printable(text.substr(position, to - position)) + (to < text.size() ? "..." : "");
-  return "  " + before + behind + "\n  " + std::string(displayWidth(before), ' ') + "^";
+  const std::string after = printable(text.substr(position, to - position)) + (to < text.size() ? "..." : "");
+  return "  " + before + after + "\n  " + std::string(displayWidth(before), ' ') + "^";
 }
 
 bool valuesMatch(const broker::Value& given, const broker::Value& found);
@@ -51,14 +51,14 @@ std::string listed(const std::vector<broker::ObjectPath>& paths) {
   return text;
 }
 
-/// Without what every path of this host has in common, as a person would type it.
+/// Without the parts that all paths of this host have in common, as a person would type it.
 broker::ObjectPath shortened(broker::ObjectPath path) {
   path.host.clear();
   path.nameSpace.clear();
   return path;
 }
 
-/// Another host has a CIM server of its own; here its objects would be mistaken for those of this host.
+/// Another host has its own CIM server; here its objects would be mistaken for those of this host.
 void requireThisHost(const Session& session, const broker::ObjectPath& path, std::string_view text) {
   if (path.host.empty() || session.isThisHost(path.host)) return;
   const std::size_t place = text.find("//") + 2;
@@ -68,7 +68,7 @@ void requireThisHost(const Session& session, const broker::ObjectPath& path, std
                 "leave the host out, or give --url with the CIM server of that host");
 }
 
-/// A path is text like any other where a key holds it, so only its class tells a path from a slip.
+/// A key may contain a path as plain text, so only its class tells a path from a typing error.
 void requireClassesOfReferences(Session& session, const broker::ObjectPath& given) {
   for (const broker::NamedValue& key : given.keys) {
     if (!isReference(key.value)) continue;

@@ -33,7 +33,7 @@ TEST(ReadPath, MarksWhatIsMissingAtTheEnd) {
   EXPECT_THAT(refusal(""), EndsWith("\n  \n  ^"));
 }
 
-TEST(ReadPath, MarksThePlaceBehindWideCharacters) {
+TEST(ReadPath, MarksThePlaceAfterWideCharacters) {
   EXPECT_THAT(refusal("\xE7\xB6\xB2.K=?"), EndsWith("\n  \xE7\xB6\xB2.K=?\n       ^"));
 }
 
@@ -68,7 +68,7 @@ TEST(ReadClassName, RefusesAnInstance) {
 
 ObjectPath path(std::vector<broker::NamedValue> keys) { return {"", "", "C", std::move(keys)}; }
 
-TEST(KeysMatch, WhereTheGivenOnesAreAmongThoseFound) {
+TEST(KeysMatch, IfTheGivenOnesAreAmongThoseFound) {
   const ObjectPath found = path({{"Name", Value::text("eth0")}, {"SystemName", Value::text("h")}});
   EXPECT_TRUE(keysMatch(path({}), found));
   EXPECT_TRUE(keysMatch(path({{"name", Value::text("eth0")}}), found));

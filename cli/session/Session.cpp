@@ -34,7 +34,7 @@ std::string similarNames(const schema::ClassRepository& classes, std::string_vie
   return "is it " + joined(similar, ", ") + "?";
 }
 
-/// Passes over what the providers log, and tells the agent's own lines.
+/// Drops the providers' lines, and prints the agent's own.
 class QuietLog : public zorva::agent::LogSink {
  public:
   void record(const zorva::agent::LogCall& /*call*/) override {}
@@ -45,7 +45,7 @@ class QuietLog : public zorva::agent::LogSink {
 
 QuietLog quietLog;
 
-/// Keeps the agent's own lines until it is known what becomes of the call.
+/// Keeps the agent's own lines until the result of the call is known.
 class HeldBackLog : public zorva::agent::LogSink {
  public:
   explicit HeldBackLog(int level) : level_(level) {}
@@ -62,7 +62,7 @@ class HeldBackLog : public zorva::agent::LogSink {
   std::vector<std::string> lines_;
 };
 
-template <class Work>
+template <typename Work>
 class Finally {
  public:
   explicit Finally(Work work) : work_(std::move(work)) {}
@@ -93,7 +93,7 @@ Session::Session(const Globals& globals)
 Session::~Session() = default;
 
 const std::shared_ptr<const schema::ClassRepository>& Session::classes() {
-  // A server may also have what describes it.
+  // A server may also have the classes that describe it.
   const auto set = isRemote() ? schema::ClassSet::Interop : schema::ClassSet::Profile;
   if (classes_ == nullptr) classes_ = schema::loadBuiltInClasses(set);
   return classes_;
@@ -106,7 +106,7 @@ const schema::Class& Session::classNamed(std::string_view name) {
 }
 
 std::shared_ptr<const zorva::agent::TreeSnapshot> Session::tree() const {
-  // What goes to the terminal anyway is told in this program's words, and a failure that ends it once.
+  // If the log is the terminal anyway, this program prints its own messages, and a final failure only once.
   const bool holdsBack = zorva::agent::currentConfig().logTarget == "stderr";
   HeldBackLog log(logLevel_);
   if (holdsBack) zorva::agent::setLogSink(&log);
@@ -145,7 +145,7 @@ Session::Changing::Changing(Session& session, bool isDryRun) : quiet_(session) {
 
 void Session::placeLogSink() const {
   if (isRemote()) return;
-  // A sink takes the lines of all targets: a file must not go without them.
+  // A sink takes the lines of all targets, so a log file must still get them.
   const zorva::agent::Config& config = zorva::agent::currentConfig();
   const bool isQuietLog = isQuiet() && config.logTarget == "stderr" && config.traceTarget == "off";
   zorva::agent::setLogSink(isQuietLog ? &quietLog : nullptr);

@@ -1,5 +1,8 @@
 #pragma once
 
+// One run of the program: the agent with its configuration, and the executor of the CIM operations, each set up at its
+// first use. Belongs to one thread.
+
 #include <functional>
 #include <memory>
 #include <optional>
@@ -17,15 +20,12 @@
 #include "cli/session/Globals.h"
 #include "frontend/SettingsClaims.h"
 
-// One run of the program: the agent with its configuration, and who does the CIM operations, each set up when a command
-// first needs it. Belongs to one thread.
-
 namespace zorva::cli {
 
 class Session {
  public:
-  /// Reads the agent's configuration, unless a server is to be asked. Throws Failure (wrong usage) where that is wrong,
-  /// or where a log cannot be opened.
+  /// Reads the agent's configuration, unless a server is used. Throws Failure (wrong usage) if the configuration is
+  /// wrong, or if a log cannot be opened.
   explicit Session(const Globals& globals);
   Session(const Session&) = delete;
   Session& operator=(const Session&) = delete;
@@ -33,32 +33,32 @@ class Session {
 
   const Layout& layout() const noexcept { return layout_; }
 
-  /// True where a server is asked, and not the providers in this process: then nothing is known of the host but what
-  /// CIM says, and tree() must not be called.
+  /// True if a server is used, and not the providers in this process. Then the host is only known through CIM, and
+  /// tree() must not be called.
   bool isRemote() const noexcept { return !url_.empty(); }
 
-  /// The server's URL as it was given.
+  /// The server's URL as given.
   const std::string& url() const noexcept { return url_; }
 
-  /// The tree of the host as it is now. Throws Failure where it, or the file that stands for it, cannot be read.
+  /// The current tree of the host. Throws Failure if it, or the file that replaces it, cannot be read.
   std::shared_ptr<const zorva::agent::TreeSnapshot> tree() const;
 
-  /// True where a path with this host in it means the host that is asked; a server judges of that itself.
+  /// True if a path with this host means the queried host; with a server, the server decides that.
   bool isThisHost(std::string_view name) const;
 
-  /// Who does the CIM operations; providers are loaded when they are first asked. Throws Failure where the tree of the
-  /// host, or the file that stands for it, cannot be read: the providers would only say that there is nothing.
+  /// Executes the CIM operations; a provider is loaded at its first use. Throws Failure if the tree of the host, or the
+  /// file that replaces it, cannot be read: the providers would only return nothing.
   Operations& cim();
 
-  /// The classes alone, for commands that ask nothing of a provider.
+  /// Only the classes, for commands that use no provider.
   const std::shared_ptr<const schema::ClassRepository>& classes();
 
-  /// The class of that name, in any case. Throws Failure (wrong usage) with names that are like it where there is none.
+  /// The class of that name, in any case. If there is none, throws Failure (wrong usage) with similar names.
   const schema::Class& classNamed(std::string_view name);
 
-  /// While it lives, neither what the broker tells of libraries that cannot be loaded is shown, nor what the providers
-  /// log on standard error, unless a log level was asked for: for commands that ask many things and say themselves what
-  /// they did not get.
+  /// While it lives, the broker's warnings about libraries and the providers' log lines are not shown on standard
+  /// error, unless a log level was requested. For commands that make many queries and report the failed ones
+  /// themselves.
   class Quiet {
    public:
     explicit Quiet(Session& session);
@@ -70,9 +70,9 @@ class Session {
     Session& session_;
   };
 
-  /// While it lives, nobody else changes settings of this host: for commands that read, decide and then change. It has
-  /// no lock where a server is asked or on a dry run. Such commands say themselves what failed: it is quiet, too.
-  /// Throws Failure where the lock of the data directory cannot be had.
+  /// While it lives, no other program changes settings of this host: for commands that read, decide and then change. It
+  /// takes no lock with a server or on a dry run. Such commands report failures themselves, so it is quiet, too. Throws
+  /// Failure if the lock of the data directory cannot be taken.
   class Changing {
    public:
     explicit Changing(Session& session, bool isDryRun = false);
@@ -91,19 +91,19 @@ class Session {
   std::string url_;
   int logLevel_;
   bool wantsLog_;
-  int quiet_ = 0;  // how many Quiet live
+  int quiet_ = 0;  ///< number of living Quiet objects
   std::string providerDirectory_;
   std::shared_ptr<const schema::ClassRepository> classes_;
   frontend::SettingsClaims claims_;
   std::unique_ptr<Operations> cim_;
 };
 
-/// Throws Failure (wrong usage) where a server is to be asked: `subcommand` reads or writes files of this host.
+/// Throws Failure (wrong usage) if a server is used: `subcommand` reads or writes files of this host.
 void requireLocal(const Globals& globals, const char* subcommand);
 
-/// Does the work with what the agent throws turned into Failure: wrong files are the user's to mend, all else is a
+/// Runs the work and converts the agent's exceptions to Failure: a wrong file is wrong usage, everything else a
 /// failure.
-template <class Work>
+template <typename Work>
 auto asFailure(Work work) {
   try {
     return work();

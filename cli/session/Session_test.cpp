@@ -14,7 +14,7 @@ using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::StartsWith;
 
-TEST(Configuration, ThatIsWrongIsToldInOneLine) {
+TEST(Configuration, ThatIsWrongIsReportedInOneLine) {
   for (const auto& [toml, told] :
        std::vector<std::pair<std::string, std::string>>{{"[agent]\nfoo = 1\n", "agent.toml:2: agent.foo: "},
                                                         {"[log]\nlevel = \"high\"\n", "agent.toml:2: log.level: "},
@@ -36,7 +36,7 @@ TEST(Configuration, CanBeNamedOnTheCommandLine) {
   expectRefused(host, {"show", "--config", "/nowhere/agent.toml"}, 2, "/nowhere/agent.toml");
 }
 
-TEST(TreeFile, ThatIsWrongIsToldInOneLineWithItsPlace) {
+TEST(TreeFile, ThatIsWrongIsReportedInOneLineWithItsPlace) {
   const TestHost host;
   for (const auto& [tree, told] : std::vector<std::pair<std::string, std::string>>{
            {"{\n\"system_name\": 5, \"nodes\": []}", "tree.json:2: system_name: "},
@@ -52,7 +52,7 @@ TEST(TreeFile, ThatIsWrongIsToldInOneLineWithItsPlace) {
   }
 }
 
-TEST(Overlay, ThatIsWrongIsAWarningWhereTheHostIsRead) {
+TEST(Overlay, ThatIsWrongIsAWarningIfTheHostIsRead) {
   const TestHost host;
   host.directory().write("data/overlay.json", "{\n{");
   const Outcome outcome = host.run({"show"});

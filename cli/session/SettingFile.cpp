@@ -27,7 +27,7 @@ constexpr std::size_t kLargestFile = std::size_t{16} << 20U;
   throw Failure(ExitCode::Failed, printable(path) + ": " + what, hint);
 }
 
-/// A file beside the one that is to be, gone again unless it took that one's place.
+/// A temporary file beside the final one; removed unless it has replaced that one.
 class DraftFile {
  public:
   explicit DraftFile(const std::string& target)
@@ -43,7 +43,7 @@ class DraftFile {
 
   const std::string& path() const noexcept { return path_; }
 
-  /// Writes it whole, to the disk. False with errno where that fails.
+  /// Writes the whole text to the disk. False with errno if that fails.
   bool fill(std::string_view text) const {
     return util::writeAll(descriptor_, text) && ::fchmod(descriptor_.get(), 0644) == 0 &&
            ::fsync(descriptor_.get()) == 0;
@@ -62,7 +62,7 @@ void requireLine(const std::string& path, const SettingLine& line) {
 
 std::string listText(const zorva::agent::StringList* list) {
   std::string text;
-  // As the providers write lists: a blank behind every element.
+  // As the providers write lists: a blank after every element.
   if (list != nullptr) {
     for (const std::string& element : *list) text += element + " ";
   }
@@ -125,12 +125,12 @@ void SettingFile::write(const std::vector<SettingLine>& lines, bool replaces) co
   }
   const DraftFile draft(path_);
   if (!draft.fill(text)) fail(path_, std::string("cannot be written: ") + std::strerror(errno));
-  // A link never takes the place of what stands there.
+  // A link never replaces an existing file.
   const int placed =
       replaces ? ::rename(draft.path().c_str(), path_.c_str()) : ::link(draft.path().c_str(), path_.c_str());
   if (placed != 0) {
     const int error = errno;
-    fail(path_, error == EEXIST ? "stands already" : std::string("cannot be written: ") + std::strerror(error),
+    fail(path_, error == EEXIST ? "exists already" : std::string("cannot be written: ") + std::strerror(error),
          error == EEXIST ? "--force puts a new file in its place" : "");
   }
   util::syncDirectory(path_.substr(0, path_.rfind('/') + 1));

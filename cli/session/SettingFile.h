@@ -1,5 +1,8 @@
 #pragma once
 
+// The file of an interface's settings, "ifcfg-NAME" in the agent's data directory: lines of KEY=VALUE. While it exists,
+// the providers read the settings from it and not from the host. The providers change values in it but add no keys.
+
 #include <optional>
 #include <string>
 #include <string_view>
@@ -7,10 +10,6 @@
 
 #include "agent/tree/TreeSnapshot.h"
 #include "cli/session/Session.h"
-
-// The file of an interface's settings, "ifcfg-NAME" in the agent's data directory: lines of KEY=VALUE. While it stands,
-// it is where the providers read the settings, whatever the host says; the providers change values in it but add no
-// keys.
 
 namespace zorva::cli {
 
@@ -25,18 +24,17 @@ struct SettingLine {
 
 class SettingFile {
  public:
-  /// The file of that interface, whether it stands or not. Throws Failure (wrong usage) for a name that no file can
-  /// have.
+  /// The file of that interface, existing or not. Throws Failure (wrong usage) for a name that no file can have.
   explicit SettingFile(const std::string& interface);
 
   const std::string& path() const noexcept { return path_; }
 
-  /// What follows the first "=" of each line that has one and is no comment, in order. Throws Failure where the file
+  /// The text after the first "=" of each line that has one and is no comment, in order. Throws Failure if the file
   /// cannot be read, is no regular file (so nothing blocks), or is larger than 16 MiB.
   std::vector<SettingLine> read() const;
 
-  /// Puts a file of these lines in place, whole or not at all. Throws Failure where it cannot, where a line would not
-  /// be one, or, without `replaces`, where the file stands already.
+  /// Writes a file of these lines, completely or not at all. Throws Failure if it cannot, if a line would not be one,
+  /// or, without `replaces`, if the file exists already.
   void write(const std::vector<SettingLine>& lines, bool replaces) const;
 
  private:
@@ -45,10 +43,10 @@ class SettingFile {
   std::string path_;
 };
 
-/// The six keys with what the host says at present of the interface.
+/// The six keys with the host's current values for the interface.
 std::vector<SettingLine> settingsOfHost(const zorva::agent::Node& interface);
 
-/// The configuration of the interface of that name. Throws Failure that lists the names there are.
+/// The configuration of the interface of that name. Throws Failure that lists the existing names.
 const zorva::agent::Node& interfaceNode(const zorva::agent::TreeSnapshot& tree, const std::string& interface);
 
 }  // namespace zorva::cli

@@ -27,7 +27,7 @@ class SettingFileTest : public testing::Test {
   }
   ~SettingFileTest() override { zorva::agent::reset(); }
 
-  template <class Work>
+  template <typename Work>
   static std::string failureOf(Work work) {
     try {
       work();
@@ -53,15 +53,15 @@ TEST_F(SettingFileTest, CanBeReadByEveryone) {
   EXPECT_EQ(status.st_mode & 0777U, 0644U);
 }
 
-TEST_F(SettingFileTest, LeavesAFileThatStandsUnlessToldOtherwise) {
+TEST_F(SettingFileTest, LeavesAnExistingFileUnlessToldOtherwise) {
   directory_.write("ifcfg-eth0", "old");
-  EXPECT_THAT(failureOf([] { SettingFile("eth0").write({{"A", "1"}}, false); }), HasSubstr("stands already"));
+  EXPECT_THAT(failureOf([] { SettingFile("eth0").write({{"A", "1"}}, false); }), HasSubstr("exists already"));
   EXPECT_EQ(contentsOf(directory_ / "ifcfg-eth0"), "old");
   SettingFile("eth0").write({{"A", "1"}}, true);
   EXPECT_EQ(contentsOf(directory_ / "ifcfg-eth0"), "A=1\n");
 }
 
-TEST_F(SettingFileTest, LeavesNothingElseBehind) {
+TEST_F(SettingFileTest, LeavesNoOtherFile) {
   directory_.write("ifcfg-eth0", "old");
   failureOf([] { SettingFile("eth0").write({{"A", "1"}}, false); });
   SettingFile("eth0").write({{"A", "1"}}, true);

@@ -1,5 +1,7 @@
 #pragma once
 
+// For tests of commands: zorvactl run as a process on hosts that are tree files, and what such a run must come to.
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
@@ -8,8 +10,6 @@
 #include <vector>
 
 #include "cli/testing/TestHost.h"
-
-// For tests of commands: zorvactl run as a process on hosts that are tree files, and what such a run must come to.
 
 namespace zorva::cli {
 
@@ -20,7 +20,7 @@ inline constexpr const char* kWholeFile =
     "BOOTPROTO=none\nHOSTNAME=host1\nDOMAINNAME=example.org\nCONFIG_NAME=\nDNSSERVERS=192.0.2.53 2001:db8::53 \n"
     "DNSSUFFIXES=example.org example.net \n";
 
-/// Standard output of a run that is expected to go well.
+/// Standard output of a run that must succeed.
 inline std::string shown(const TestHost& host, const Words& words) {
   const Outcome outcome = host.run(words);
   EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
@@ -32,7 +32,7 @@ inline nlohmann::json jsonShown(const TestHost& host, Words words) {
   return nlohmann::json::parse(shown(host, words));
 }
 
-/// Checks that a run ends with this exit code and tells this, without a word on standard output.
+/// Checks that a run ends with this exit code and this message, without standard output.
 inline void expectRefused(const TestHost& host, const Words& words, int exitCode, const std::string& told) {
   const Outcome outcome = host.run(words);
   EXPECT_EQ(outcome.exitCode, exitCode);
@@ -40,7 +40,7 @@ inline void expectRefused(const TestHost& host, const Words& words, int exitCode
   EXPECT_THAT(outcome.err, testing::HasSubstr(told));
 }
 
-/// Does it without a warning.
+/// Runs it; it must succeed without a warning.
 inline std::string done(const TestHost& host, const Words& words) {
   const Outcome outcome = host.run(words);
   EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
@@ -55,7 +55,7 @@ inline void expectFailed(const TestHost& host, const Words& words, int exitCode,
   EXPECT_THAT(outcome.err, testing::HasSubstr(told));
 }
 
-/// A host on which both interfaces have their files.
+/// A host on which both interfaces have files.
 class Changing : public testing::Test {
  protected:
   Changing() { host_.directory().write("data/ifcfg-eth0", kWholeFile); }

@@ -33,7 +33,7 @@ Pair makePipe() {
   return {ends[0], ends[1]};
 }
 
-/// A terminal of 60 columns: what is written to one end is read at the other.
+/// A terminal of 60 columns: text written to one end is read at the other.
 Pair makeTerminal() {
   const int master = ::posix_openpt(O_RDWR | O_NOCTTY | O_CLOEXEC);
   if (master < 0 || ::grantpt(master) != 0 || ::unlockpt(master) != 0) throw std::runtime_error("no terminal");
@@ -163,12 +163,12 @@ Outcome TestHost::runOnFreshMachine(const std::vector<std::string>& words) const
   return runPrepared(hide, {}, words, OutputTo::Pipe);
 }
 
-Outcome TestHost::runAsNobody(const std::vector<std::string>& words) const {
-  const unsigned nobody = 65534;
+Outcome TestHost::runUnprivileged(const std::vector<std::string>& words) const {
+  const unsigned unprivileged = 65534;
   const bool isRoot = ::geteuid() == 0;
   ::chmod(directory_.path().c_str(), 0755);
   ::chmod(dataFile("").c_str(), isRoot ? 0755 : 0555);
-  const auto become = [&] { return !isRoot || ::setuid(nobody) == 0; };
+  const auto become = [&] { return !isRoot || ::setuid(unprivileged) == 0; };
   Outcome outcome = runPrepared(become, {}, words, OutputTo::Pipe);
   ::chmod(dataFile("").c_str(), 0755);
   return outcome;

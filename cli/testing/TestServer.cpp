@@ -19,7 +19,7 @@ namespace zorva::cli {
 
 namespace {
 
-/// What comes from a pipe until a line has ended, or nothing comes for ten seconds.
+/// The text from a pipe until a line has ended, or nothing arrives for ten seconds.
 std::string firstLine(int pipe) {
   std::string line;
   pollfd waiting{pipe, POLLIN, 0};
@@ -30,7 +30,7 @@ std::string firstLine(int pipe) {
   return line;
 }
 
-/// The length of the whole request that begins like this; 0 where that is not known yet.
+/// The length of the whole request with this beginning; 0 if that is not known yet.
 std::size_t requestLength(const std::string& text) {
   const std::size_t end = text.find("\r\n\r\n");
   if (end == std::string::npos) return 0;

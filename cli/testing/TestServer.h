@@ -1,5 +1,7 @@
 #pragma once
 
+// For tests of --url: the CIM server of this project on a test host, and a server that sends what a test says.
+
 #include <sys/types.h>
 
 #include <functional>
@@ -9,13 +11,11 @@
 #include <thread>
 #include <vector>
 
-// For tests of --url: the CIM server of this project on a test host, and a server that says what a test wants it to.
-
 namespace zorva::cli {
 
 class TestHost;
 
-/// zorvacimd, serving a test host on a port of its own while this lives.
+/// zorvacimd, which serves a test host on its own port while this object lives.
 class TestServer {
  public:
   explicit TestServer(const TestHost& host);
@@ -23,7 +23,7 @@ class TestServer {
   TestServer(const TestServer&) = delete;
   TestServer& operator=(const TestServer&) = delete;
 
-  /// "http://127.0.0.1:40000"; empty where it did not start.
+  /// "http://127.0.0.1:40000"; empty if it did not start.
   const std::string& url() const { return url_; }
 
  private:
@@ -31,14 +31,14 @@ class TestServer {
   std::string url_;
 };
 
-/// A server that says what a test wants. Each connection takes one request.
+/// A server that sends what a test says. Each connection takes one request.
 class ScriptedServer {
  public:
-  /// Gives the whole text of the HTTP reply to a request; nothing: there are no more.
+  /// Returns the whole text of the HTTP reply to a request; nothing: there are no more.
   using Answer = std::function<std::optional<std::string>(const std::string& request)>;
   explicit ScriptedServer(Answer answer);
 
-  /// These replies, one to each request, whatever that says; none after the last of them.
+  /// These replies, one for each request, independent of its text; none after the last of them.
   explicit ScriptedServer(std::vector<std::string> replies);
   ~ScriptedServer();
   ScriptedServer(const ScriptedServer&) = delete;
@@ -53,11 +53,11 @@ class ScriptedServer {
   static std::string reply(const std::string& body, const std::string& status = "200 OK",
                            const std::string& fields = {});
 
-  /// A reply with a CIM-XML response in it: what stands in an IMETHODRESPONSE.
+  /// A reply with a CIM-XML response in it: the content of an IMETHODRESPONSE.
   static std::string cimReply(const std::string& content);
 
-  /// The same as some servers give it that fail after they have begun: a complete document in chunks, and the failure
-  /// in the trailers after it.
+  /// The same as from servers that fail after they have begun: a complete document in chunks, and the failure in the
+  /// trailers after it.
   static std::string failedReply(const std::string& content, const std::string& code, const std::string& description);
 
  private:

@@ -1,5 +1,6 @@
-// The classes here, held against the published CIM Schema: against the facts of it that are kept beside this test, and
-// against its own files too, in a build that has them at hand.
+// Compares the classes here with the published CIM Schema: with its facts, which are kept beside this test, and, in a
+// build that has them, with its own files.
+
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -34,7 +35,7 @@ void read(const Source& source, ClassRepository& classes) {
   ASSERT_FALSE(error) << error->text();
 }
 
-// What stands for a text in the facts: FNV-1a with 32 bits.
+// The replacement for a text in the facts: FNV-1a with 32 bits.
 std::string checksum(std::string_view text) {
   std::uint32_t sum = 0x811C9DC5;
   for (const char c : text) sum = (sum ^ static_cast<unsigned char>(c)) * 0x01000193;
@@ -43,7 +44,7 @@ std::string checksum(std::string_view text) {
   return digits;
 }
 
-// The checksum of a qualifier's texts; facts hold nothing else.
+// The checksum of a qualifier's texts; the facts contain only the checksum.
 std::string checksum(const Value& value) {
   std::string text;
   if (!value.isArray) text = textOf(value);
@@ -74,7 +75,7 @@ std::string outline(const Class& one) {
   return writeMof(declared);
 }
 
-// Qualifiers that a class here must have where the published class has them, and nowhere else.
+// Qualifiers that a class here must have exactly if the published class has them.
 constexpr const char* kWithMeaning[] = {"Key",           "Abstract", "Association", "Aggregation", "Aggregate",
                                         "Override",      "Write",    "Weak",        "Required",    "ArrayType",
                                         "MaxLen",        "Min",      "Max",         "Out",         "Version",
@@ -132,7 +133,7 @@ class PublishedSchema : public ::testing::TestWithParam<Source> {
   }
 
   const std::shared_ptr<const ClassRepository> classes_ = loadBuiltInClasses(ClassSet::Interop);
-  std::vector<const Class*> common_;  // the classes here that the published schema has as well
+  std::vector<const Class*> common_;  // the classes here that are in the published schema too
   ClassRepository published_;
 };
 
@@ -176,7 +177,7 @@ TEST_P(PublishedSchema, SharesNoDescriptionWithTheClassesHere) {
   for (const std::string& sum : descriptions(classes_->classes())) EXPECT_FALSE(published.contains(sum)) << sum;
 }
 
-// So a server that has the published schema takes zorva.mof.
+// So a server that has the published schema accepts zorva.mof.
 TEST_P(PublishedSchema, TakesTheZorvaClassesOnTop) {
   read({"Zorva", ZORVA_SOURCE_DIR "/schema/zorva.mof"}, published_);
   EXPECT_NE(published_.find("ZORVA_DNSProtocolEndPoint"), nullptr);
@@ -195,7 +196,7 @@ TEST_P(PublishedSchema, IsWrittenAndReadBackTheSame) {
 }
 
 #ifdef ZORVA_CIM_SCHEMA_DIR
-// The facts were read by another reader than the one that reads the original here.
+// Another reader extracted the facts than the one that reads the original here.
 TEST(PublishedSchemaFacts, AreThoseOfTheOriginal) {
   ClassRepository facts;
   ClassRepository original;

@@ -22,7 +22,7 @@ KEPT = {name.lower() for name in (
     "Write").split()}
 TEXTS = {"description", "values"}
 HEADER = """// Facts of CIM Schema 2.49 that the classes and qualifier types here must agree with: names, types, and the qualifiers
-// that mean something to a program. Texts are not here; a checksum stands for each.
+// that mean something to a program. Texts are not here; a checksum replaces each.
 //
 // Written by extract_facts.py.
 """
