@@ -1,4 +1,5 @@
 // The cost of the providers by the number of objects, through the broker, as a client of zorvactl sees it.
+
 #include <benchmark/benchmark.h>
 #include <fcntl.h>
 #include <sys/stat.h>

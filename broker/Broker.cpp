@@ -99,7 +99,7 @@ Status makeSource(Arena& arena, const ObjectPath& path, int unknownClass, PathOb
 }
 
 /// Opens a request and runs `operation(Request&)` in it. Throws only std::bad_alloc and what a sink throws.
-template <class Operation>
+template <typename Operation>
 Status inRequest(BrokerCore& core, const Caller& caller, CMPIFlags flags, Operation&& operation) {
   try {
     Request request(core);

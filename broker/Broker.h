@@ -1,16 +1,5 @@
 #pragma once
 
-#include <memory>
-#include <optional>
-#include <string>
-#include <string_view>
-#include <vector>
-
-#include "broker/core/BrokerOptions.h"
-#include "broker/objects/Value.h"
-#include "broker/requests/Operations.h"
-#include "schema/ClassRepository.h"
-
 // A CMPI 2.0 broker in this process: it loads providers, passes a client's requests to them, and serves their up-calls.
 //
 // Threads: once constructed, one Broker may be used by any number of threads at once. Each request runs on the thread
@@ -21,6 +10,17 @@
 // clients get them in the schema's spelling. An empty namespace means the registry's default.
 //
 // Failures are returned as values. Functions throw only std::bad_alloc, and only while they build the caller's values.
+
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "broker/core/BrokerOptions.h"
+#include "broker/objects/Value.h"
+#include "broker/requests/Operations.h"
+#include "schema/ClassRepository.h"
 
 struct _CMPIBroker;
 

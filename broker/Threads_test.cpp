@@ -1,3 +1,5 @@
+// CMPIBrokerExtFT and attaching: the broker's functions for providers that run their own threads.
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <unistd.h>
@@ -16,8 +18,6 @@
 #include "broker/requests/Request.h"
 #include "broker/requests/Result.h"
 #include "broker/testing/TestClasses.h"
-
-// CMPIBrokerExtFT and attaching: the broker's functions for providers that run their own threads.
 
 namespace zorva::broker {
 namespace {

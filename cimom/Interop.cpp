@@ -1,5 +1,8 @@
 #include "cimom/Interop.h"
 
+#include <cmpidt.h>
+#include <cmpift.h>
+#include <cmpimacs.h>
 #include <unistd.h>
 
 #include <climits>
@@ -9,9 +12,6 @@
 #include "broker/objects/Data.h"
 #include "broker/objects/Scope.h"
 #include "cimom/InteropModel.h"
-#include "cmpidt.h"
-#include "cmpift.h"
-#include "cmpimacs.h"
 #include "schema/Schema.h"
 #include "util/Names.h"
 
@@ -161,7 +161,7 @@ CMPIStatus cleanUpAssociations(CMPIAssociationMI* mi, const CMPIContext*, CMPIBo
 bool fits(const std::string& name, const char* role) { return role == nullptr || util::sameName(name, role); }
 
 /// The associations of `source`: `visit(association, far end)` for each end that is `source`.
-template <class Visit>
+template <typename Visit>
 void walk(const InteropWorld& world, const ObjectPath& source, const char* association, const char* role,
           const char* resultRole, Visit&& visit) {
   for (const Instance& one : interopInstances(world, association)) {
@@ -258,13 +258,13 @@ CMPIStatus invoke(CMPIMethodMI* mi, const CMPIContext* context, const CMPIResult
 
 CMPIMethodMIFT methodTable = {200, 200, "methodInterop", cleanUpMethods, invoke};
 
-template <class Mi, class Table, Table* table>
+template <typename Mi, typename Table, Table* table>
 Mi* createMi(const CMPIBroker* broker, const CMPIContext*, CMPIStatus* status) {
   if (status != nullptr) *status = kOk;
   return new Mi{const_cast<CMPIBroker*>(broker), table};
 }
 
-template <class Function>
+template <typename Function>
 broker::LinkedFunction linked(const char* kind, Function* function) {
   return {std::string(kPrefix) + "_Create_" + kind, reinterpret_cast<void (*)()>(function)};
 }

@@ -1,11 +1,11 @@
 #pragma once
 
-#include "broker/Broker.h"
-
 // The server's description of itself, in the namespaces "interop" and "root/interop": its namespaces, itself as
 // CIM_ObjectManager, its protocol, and the registration (DSP1033) of its DNS client profile. The endpoints that conform
 // to it are the profile's central instances. The association from an endpoint to the profile is in the endpoint's own
 // namespace as well.
+
+#include "broker/Broker.h"
 
 namespace zorva::cimom {
 

@@ -1,12 +1,12 @@
 #pragma once
 
+// The instances of the interop namespaces, as plain values.
+
 #include <string>
 #include <string_view>
 #include <vector>
 
 #include "broker/objects/Value.h"
-
-// The instances of the interop namespaces, as plain values.
 
 namespace zorva::cimom {
 

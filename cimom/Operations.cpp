@@ -1,10 +1,11 @@
 #include "cimom/Operations.h"
 
+#include <cmpidt.h>
+
 #include <algorithm>
 
 #include "broker/objects/PathText.h"
 #include "cimxml/ElementWriter.h"
-#include "cmpidt.h"
 #include "util/Utf8.h"
 
 namespace zorva::cimom {
@@ -40,7 +41,7 @@ OperationFunction findOperation(std::string_view name) noexcept {
 }
 
 /// The name of a parameter that is given twice, in any case; empty if there is none.
-template <class Parameters>
+template <typename Parameters>
 std::string_view twice(const Parameters& parameters) {
   std::vector<std::string_view> names;
   for (const auto& one : parameters) names.push_back(one.name);

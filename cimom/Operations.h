@@ -1,5 +1,8 @@
 #pragma once
 
+// The operations of DSP0200 1.4. Each takes its parameters from a call, lets the broker or the schema do the work, and
+// writes its response while the results arrive.
+
 #include <exception>
 #include <functional>
 #include <string>
@@ -11,9 +14,6 @@
 #include "cimom/ServiceHost.h"
 #include "cimxml/RequestReader.h"
 #include "cimxml/ResponseWriter.h"
-
-// The operations of DSP0200 1.4. Each takes its parameters from a call, lets the broker or the schema do the work, and
-// writes its response while the results arrive.
 
 namespace zorva::cimom {
 
@@ -66,7 +66,7 @@ class Stream {
   explicit Stream(cimxml::ResponseWriter& writer) : writer_(writer) {}
 
   /// Runs `append(std::string&)`. False if the response cannot go on: the provider must end.
-  template <class Append>
+  template <typename Append>
   bool put(Append&& append) {
     try {
       append(writer_.out());

@@ -1,8 +1,9 @@
 #include "cimom/OperationsArguments.h"
 
+#include <cmpidt.h>
+
 #include <charconv>
 
-#include "cmpidt.h"
 #include "util/Names.h"
 
 namespace zorva::cimom {

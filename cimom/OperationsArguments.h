@@ -1,5 +1,8 @@
 #pragma once
 
+// The parameters of an intrinsic operation, taken one by one under the names and with the defaults of DSP0200. The
+// first error is remembered; after the operation has taken all its parameters, it asks once with status().
+
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -8,9 +11,6 @@
 
 #include "broker/objects/Value.h"
 #include "cimxml/RequestReader.h"
-
-// The parameters of an intrinsic operation, taken one by one under the names and with the defaults of DSP0200. The
-// first error is remembered; after the operation has taken all its parameters, it asks once with status().
 
 namespace zorva::cimom {
 
@@ -27,7 +27,7 @@ class Arguments {
   /// Empty if it is left out or null.
   std::string className(std::string_view name);
 
-  // Required parameters.
+  /// Required parameters.
   std::string requiredText(std::string_view name);
   std::string requiredClassName(std::string_view name);
   broker::ObjectPath requiredPath(std::string_view name);

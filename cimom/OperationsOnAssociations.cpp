@@ -1,3 +1,8 @@
+// DSP0200 5.3.2.14 Associators, .15 AssociatorNames, .16 References, .17 ReferenceNames; for instances by the broker,
+// for classes from the schema.
+
+#include <cmpidt.h>
+
 #include <algorithm>
 
 #include "cimom/Operations.h"
@@ -5,10 +10,6 @@
 #include "cimom/OperationsSelection.h"
 #include "cimxml/ClassWriter.h"
 #include "cimxml/ElementWriter.h"
-#include "cmpidt.h"
-
-// DSP0200 5.3.2.14 Associators, .15 AssociatorNames, .16 References, .17 ReferenceNames; for instances by the broker,
-// for classes from the schema.
 
 namespace zorva::cimom {
 

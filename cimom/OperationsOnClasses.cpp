@@ -1,11 +1,12 @@
+// DSP0200 5.3.2.1 GetClass, .9 EnumerateClasses, .10 EnumerateClassNames, .22 GetQualifier, .24 EnumerateQualifiers.
+// All namespaces have the same classes.
+
+#include <cmpidt.h>
+
 #include "cimom/Operations.h"
 #include "cimom/OperationsArguments.h"
 #include "cimxml/ClassWriter.h"
 #include "cimxml/QualifierWriter.h"
-#include "cmpidt.h"
-
-// DSP0200 5.3.2.1 GetClass, .9 EnumerateClasses, .10 EnumerateClassNames, .22 GetQualifier, .24 EnumerateQualifiers.
-// All namespaces have the same classes.
 
 namespace zorva::cimom {
 

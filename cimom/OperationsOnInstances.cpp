@@ -1,12 +1,13 @@
+// DSP0200 5.3.2.2 GetInstance, .4 DeleteInstance, .6 CreateInstance, .8 ModifyInstance, .11 EnumerateInstances,
+// .12 EnumerateInstanceNames, .18 GetProperty, .19 SetProperty.
+
+#include <cmpidt.h>
+
 #include "cimom/Operations.h"
 #include "cimom/OperationsArguments.h"
 #include "cimom/OperationsSelection.h"
 #include "cimxml/ElementWriter.h"
-#include "cmpidt.h"
 #include "frontend/ReadBack.h"
-
-// DSP0200 5.3.2.2 GetInstance, .4 DeleteInstance, .6 CreateInstance, .8 ModifyInstance, .11 EnumerateInstances,
-// .12 EnumerateInstanceNames, .18 GetProperty, .19 SetProperty.
 
 namespace zorva::cimom {
 

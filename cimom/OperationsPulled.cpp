@@ -1,10 +1,11 @@
+// DSP0200 5.3.2.24: enumerations that a client opens, pulls and closes.
+
+#include <cmpidt.h>
+
 #include "cimom/Operations.h"
 #include "cimom/OperationsArguments.h"
 #include "cimom/OperationsSelection.h"
 #include "cimxml/ElementWriter.h"
-#include "cmpidt.h"
-
-// DSP0200 5.3.2.24: enumerations that a client opens, pulls and closes.
 
 namespace zorva::cimom {
 

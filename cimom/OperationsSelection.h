@@ -1,11 +1,11 @@
 #pragma once
 
+// The parameters that many operations share.
+
 #include "broker/Broker.h"
 #include "cimom/Operations.h"
 #include "cimom/OperationsArguments.h"
 #include "cimxml/ElementWriter.h"
-
-// The parameters that many operations share.
 
 namespace zorva::cimom {
 

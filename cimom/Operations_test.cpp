@@ -1,4 +1,5 @@
 // Each operation as a client sees it: the request as XML, and the response as XML. Every response is validated.
+
 #include "cimom/Operations.h"
 
 #include <gmock/gmock.h>

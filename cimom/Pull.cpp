@@ -62,7 +62,7 @@ PullTable::Map::iterator PullTable::nextToGiveWay(Weight weightOf, std::size_t& 
   return longestWaiting([&](const Open& open) { return weights[open.client] == weight; });
 }
 
-template <class Predicate>
+template <typename Predicate>
 PullTable::Map::iterator PullTable::longestWaiting(Predicate&& isMeant) {
   auto longest = open_.end();
   for (auto each = open_.begin(); each != open_.end(); ++each) {

@@ -1,5 +1,16 @@
 #pragma once
 
+// Enumerations that clients pull in pieces (DSP0200 5.3.2.24). The objects are collected when the enumeration is opened
+// and are kept as the text of the responses. So a client sees one state of the system, and a slow client does not keep
+// a provider busy. The number of enumerations and their bytes are limited. An enumeration that its client does not
+// continue is dropped after its timeout.
+//
+// If there is no room, the enumeration that has waited longest for its client is dropped, so that no client is locked
+// out: one of the same client if it has as many as a client may have, else one of the client that has most. An
+// enumeration that fits its first response is never kept and needs no room.
+//
+// Any number of threads may use one PullTable at once.
+
 #include <atomic>
 #include <chrono>
 #include <cstddef>
@@ -12,17 +23,6 @@
 #include <string_view>
 
 #include "broker/objects/Value.h"
-
-// Enumerations that clients pull in pieces (DSP0200 5.3.2.24). The objects are collected when the enumeration is opened
-// and are kept as the text of the responses. So a client sees one state of the system, and a slow client does not keep
-// a provider busy. The number of enumerations and their bytes are limited. An enumeration that its client does not
-// continue is dropped after its timeout.
-//
-// If there is no room, the enumeration that has waited longest for its client is dropped, so that no client is locked
-// out: one of the same client if it has as many as a client may have, else one of the client that has most. An
-// enumeration that fits its first response is never kept and needs no room.
-//
-// Any number of threads may use one PullTable at once.
 
 namespace zorva::cimom {
 
@@ -127,14 +127,14 @@ class PullTable {
   bool takeBytes(std::size_t size, std::size_t held);
   void makeRoomFor(const std::string& client);
   Map::iterator nextToGiveWay(Weight weightOf, std::size_t& weight);
-  template <class Predicate>
+  template <typename Predicate>
   Map::iterator longestWaiting(Predicate&& isMeant);
   broker::Status find(const std::string& context, std::string_view nameSpace, Map::iterator& found);
 
   const PullLimits limits_;
   std::atomic<std::size_t> bytes_ = 0;
   mutable std::mutex mutex_;
-  Map open_;  // guarded by mutex_
+  Map open_;  ///< guarded by mutex_
 };
 
 }  // namespace zorva::cimom

@@ -1,5 +1,7 @@
 #include "cimom/Service.h"
 
+#include <cmpidt.h>
+
 #include <algorithm>
 #include <chrono>
 #include <exception>
@@ -12,7 +14,6 @@
 #include "cimom/ServiceHost.h"
 #include "cimxml/RequestReader.h"
 #include "cimxml/ResponseWriter.h"
-#include "cmpidt.h"
 
 namespace zorva::cimom {
 

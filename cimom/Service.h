@@ -1,5 +1,8 @@
 #pragma once
 
+// CIM operations over HTTP (DSP0200 1.4) without the HTTP: reads a request's XML, executes it on the broker, and writes
+// the response's XML while the results arrive.
+
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
@@ -10,9 +13,6 @@
 
 #include "broker/Broker.h"
 #include "http/Exchange.h"
-
-// CIM operations over HTTP (DSP0200 1.4) without the HTTP: reads a request's XML, executes it on the broker, and writes
-// the response's XML while the results arrive.
 
 namespace zorva::cimom {
 
@@ -28,7 +28,7 @@ struct ServiceOptions {
   std::size_t maxOperations = 100;  ///< the most operations in one multiple request
   std::size_t unsentText = 65536;   ///< response text that is gathered before it is written
 
-  // Enumerations that are pulled (DSP0200 5.3.2.24).
+  /// Enumerations that are pulled (DSP0200 5.3.2.24).
   std::chrono::seconds pullDefaultTimeout{60};
   std::chrono::seconds pullMaxTimeout{600};  ///< a longer one is refused, and also a timeout of 0, which means none
   std::size_t maxPulls = 100;                ///< open at once

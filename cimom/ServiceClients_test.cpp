@@ -1,5 +1,6 @@
 // The server as other programs see it: each operation of sblim's wbemcli is run against zorvacimd on a host that is a
 // file.
+
 #include <fcntl.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

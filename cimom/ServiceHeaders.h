@@ -1,5 +1,7 @@
 #pragma once
 
+// The CIM header fields of HTTP (DSP0200 1.4, 6.3 and 7): reads them, and checks that they agree with the body.
+
 #include <optional>
 #include <string>
 #include <string_view>
@@ -8,8 +10,6 @@
 #include "cimxml/RequestReader.h"
 #include "http/Exchange.h"
 #include "util/Expected.h"
-
-// The CIM header fields of HTTP (DSP0200 1.4, 6.3 and 7): reads them, and checks that they agree with the body.
 
 namespace zorva::cimom {
 

@@ -1,9 +1,9 @@
 #pragma once
 
+// The names and addresses of the host that the server runs on.
+
 #include <string>
 #include <string_view>
-
-// The names and addresses of the host that the server runs on.
 
 namespace zorva::cimom {
 

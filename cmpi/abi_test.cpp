@@ -42,7 +42,7 @@ std::string withoutBlanks(std::string text) {
 
 // ---- Records, types, constants ----
 
-template <class Type>
+template <typename Type>
 constexpr bool isFunctionPointer = std::is_pointer_v<Type>&& std::is_function_v<std::remove_pointer_t<Type>>;
 
 TEST(CMPI_ABI_SUITE, EveryRecordIsLaidOutAsTheStandardSays) {
@@ -147,7 +147,7 @@ TEST(CMPI_ABI_SUITE, EveryConstantHasTheValueOfTheStandard) {
 using Words = std::vector<std::uint64_t>;
 
 // Any value that passes through a slot, as a number that can be compared.
-template <class Type>
+template <typename Type>
 std::uint64_t word(Type value) {
   if constexpr (std::is_pointer_v<Type>) {
     return reinterpret_cast<std::uintptr_t>(value);
@@ -164,7 +164,7 @@ std::uint64_t word(Type value) {
 
 // A value to pass at a position, different from that of any other position of the same type. Pointers point into memory
 // that is never read.
-template <class Type>
+template <typename Type>
 std::remove_cv_t<Type> argument(int position) {
   using Plain = std::remove_cv_t<Type>;
   alignas(16) static std::array<char, 1024> memory;
@@ -247,7 +247,7 @@ Words inserts(unsigned count, ...) {
 template <auto Member>
 struct Slot;
 
-template <class Table, class Result, class... Args, Result (*Table::*Member)(Args...)>
+template <typename Table, typename Result, typename... Args, Result (*Table::*Member)(Args...)>
 struct Slot<Member> {
   using Answer = Result;
   static inline char id = 0;
@@ -294,7 +294,7 @@ struct Slot<&CMPIBrokerEncFT::getMessage2> {
 #include "abi_fill.inc"
 
 // An object whose table records.
-template <class Object>
+template <typename Object>
 struct Fake {
   Fake() {
     fill(ft);
@@ -321,7 +321,7 @@ struct Fake<CMPIBroker> {
   CMPIBroker object{};
 };
 
-template <auto Member, class Type>
+template <auto Member, typename Type>
 void expectAnswer(Type got) {
   EXPECT_TRUE((std::is_same_v<Type, typename Slot<Member>::Answer>)) << "the macro's type is not that of the slot";
   EXPECT_EQ(word(got), word(argument<typename Slot<Member>::Answer>(kAnswer))) << "the slot's answer got lost";
@@ -342,9 +342,9 @@ void expectCall(const Words& words) {
 #endif
 
 // The type of the value in a CMFmt... pair, without const where it is a pointer.
-template <class Type>
+template <typename Type>
 Type second(int, Type);
-template <class Type>
+template <typename Type>
 using Unqualified = std::conditional_t<std::is_pointer_v<Type>,
                                        std::add_pointer_t<std::remove_const_t<std::remove_pointer_t<Type>>>, Type>;
 
@@ -580,7 +580,7 @@ struct CmpiProviderBase {
 
 #include "abi_factory_functions.inc"
 
-template <class Base>
+template <typename Base>
 struct ClassProvider : Base {
   ClassProvider(const CmpiBroker& given, const CmpiContext&) { this->broker = given.broker; }
 };
@@ -590,7 +590,7 @@ CMProviderBase(ClassProvider)
 
     namespace {
 
-  template <class Provider>
+  template <typename Provider>
   Provider* createSample(Provider * (*create)(const CMPIBroker*, const CMPIContext*, CMPIStatus*)) {
     const CMPIBroker broker{};
     const int hooks = sampleHooks;
@@ -602,7 +602,7 @@ CMProviderBase(ClassProvider)
     return provider;
   }
 
-  template <class Provider>
+  template <typename Provider>
   Provider* createOfClass(Provider * (*create)(const CMPIBroker*, const CMPIContext*, CMPIStatus*)) {
     baseClassProvider = {};
     const CMPIBroker broker{};

@@ -1,4 +1,5 @@
 // The factory's functions for associations: the class at the far end, its path, the endpoint of an interface.
+
 #include <cstring>
 
 #include "factory/CmpiSupport.h"

@@ -9,6 +9,9 @@
 #include "RecordingLogger.h"
 #include "World.h"
 #include "factory/DNSClientObjFactory.h"
+#include "tests/support/RecordingBroker.h"
+#include "tests/support/RecordingLogger.h"
+#include "tests/support/World.h"
 
 namespace ZV::Test {
 namespace {

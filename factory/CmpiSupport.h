@@ -1,5 +1,6 @@
-// CMPI's objects for this library: the support that every provider has, and paths with this system as their host.
 #pragma once
+
+// CMPI's objects for this library: the support that every provider has, and paths with this system as their host.
 
 #include <cmpidt.h>
 
@@ -11,10 +12,10 @@ namespace ZV {
 
 using namespace zorva::cmpi;
 
-// Every path gets this system's name as its host again.
+/// Every path gets this system's name as its host again.
 void setNameSpaceAndHost(CMPIObjectPath* path, const std::string& nameSpace);
 
-// A new path with that namespace and this system's name as its host; the broker's result, good or not.
+/// A new path with that namespace and this system's name as its host; the broker's result, good or not.
 CMPIObjectPath* newHostPath(const CMPIBroker* broker, const std::string& nameSpace, const char* className,
                             CMPIStatus* rc);
 

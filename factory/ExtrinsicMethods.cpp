@@ -1,5 +1,6 @@
 // The factory's functions for the endpoint's extrinsic methods. Each works on a copy of the endpoint's record and drops
 // it: the host is changed only by modifying instances.
+
 #include "factory/CmpiSupport.h"
 #include "factory/DNSClientObjFactory.h"
 #include "trace/Trace.h"

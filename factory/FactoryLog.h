@@ -4,7 +4,7 @@
 
 namespace ZV {
 
-// The log category of the object functions.
+/// The log category of the object functions.
 extern const std::string loggerDNSObjFactory;
 
 }  // namespace ZV

@@ -1,6 +1,7 @@
+#pragma once
+
 // The effect of ModifyInstance. The two classes of setting data write to the interface's file, the endpoint writes to
 // the node. The two are not synchronized.
-#pragma once
 
 #include <cmpidt.h>
 
@@ -10,21 +11,21 @@ namespace ZV {
 // takes effect at once and is not undone if a later one fails. properties is only logged: all properties of the
 // instance are written. status is passed to the broker's calls and must not be null.
 
-// Writes RequestedHostname, DomainName, DNSServerAddresses and ConfigurationName of the interface whose InstanceID is
-// the key of ref. If the file or a key is missing, the value is dropped without an error. Without ConfigurationName its
-// key is emptied.
+/// Writes RequestedHostname, DomainName, DNSServerAddresses and ConfigurationName of the interface whose InstanceID is
+/// the key of ref. If the file or a key is missing, the value is dropped without an error. Without ConfigurationName
+/// its key is emptied.
 unsigned int modifyDNSSettingDataCMPIInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                               const char** properties, const CMPIInstance* instance,
                                               CMPIStatus* status);
 
-// Writes DNSSuffixesToAppend and ConfigurationName; the InstanceID of ref is ignored. FAILED if the instance has
-// neither.
+/// Writes DNSSuffixesToAppend and ConfigurationName; the InstanceID of ref is ignored. FAILED if the instance has
+/// neither.
 unsigned int modifyDNSGeneralSettingDataCMPIInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                                      const char** properties, const CMPIInstance* instance,
                                                      CMPIStatus* status);
 
-// Writes DNSSuffixesToAppend, DomainName and Hostname of every node whose name is the key Name of ref; OK even if there
-// is none.
+/// Writes DNSSuffixesToAppend, DomainName and Hostname of every node whose name is the key Name of ref; OK even if
+/// there is none.
 unsigned int modifyDNSProtocolEndpointCMPIInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                                    const char** properties, const CMPIInstance* instance,
                                                    CMPIStatus* status);

@@ -1,6 +1,7 @@
+#pragma once
+
 // Sets properties of instances: those of setting data, from the getter of the cursor if the request includes them and
 // the getter has a value; and arrays.
-#pragma once
 
 #include <string>
 #include <vector>
@@ -32,7 +33,7 @@ void setBooleanIfWanted(const CMPIInstance* instance, const WantedProperties& wa
   if (wanted(name) && (cursor.*getter)(value)) setBoolean(instance, name, value);
 }
 
-// Null, with an error, if the broker makes none.
+/// Null, with an error, if the broker makes none.
 inline CMPIArray* newPropertyArray(const CMPIBroker* broker, const std::string& property, CMPICount size,
                                    CMPIType elementType, const LogSite& site, CMPIStatus* status) {
   CMPIArray* array = newArray(broker, size, elementType, status);
@@ -42,7 +43,7 @@ inline CMPIArray* newPropertyArray(const CMPIBroker* broker, const std::string& 
   return array;
 }
 
-// Sets an array property; setElement(array, i) fills each element. False, with an error, if the broker makes no array.
+/// Sets an array property; setElement(array, i) fills each element. False, with an error, if the broker makes no array.
 template <typename Element, typename SetElement>
 bool setElements(const CMPIBroker* broker, const CMPIInstance* instance, const char* property, CMPIType elementType,
                  const std::vector<Element>& elements, const LogSite& site, CMPIStatus* status, SetElement setElement) {

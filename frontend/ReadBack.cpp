@@ -1,6 +1,7 @@
 #include "frontend/ReadBack.h"
 
-#include "cmpidt.h"
+#include <cmpidt.h>
+
 #include "frontend/SettingPlace.h"
 
 namespace zorva::frontend {

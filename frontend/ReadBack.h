@@ -1,13 +1,13 @@
 #pragma once
 
+// Reads an instance again after a modification: a provider may report success and store nothing. Safe on any thread.
+
 #include <functional>
 #include <optional>
 #include <string>
 #include <vector>
 
 #include "broker/Broker.h"
-
-// Reads an instance again after a modification: a provider may report success and store nothing. Safe on any thread.
 
 namespace zorva::frontend {
 

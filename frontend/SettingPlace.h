@@ -1,13 +1,13 @@
 #pragma once
 
+// Where this host stores a modification: in the interface's settings file, or in the agent's overlay, both in the
+// agent's data directory. Safe on any thread.
+
 #include <optional>
 #include <string>
 #include <string_view>
 
 #include "broker/objects/Value.h"
-
-// Where this host stores a modification: in the interface's settings file, or in the agent's overlay, both in the
-// agent's data directory. Safe on any thread.
 
 namespace zorva::frontend {
 

@@ -1,5 +1,8 @@
 #pragma once
 
+// Holds the lock of the agent's data directory while providers use interface files: shared while they read them,
+// exclusive while they change settings.
+
 #include <memory>
 #include <optional>
 #include <string>
@@ -8,9 +11,6 @@
 #include "agent/SettingsLock.h"
 #include "agent/tree/TreeSnapshot.h"
 #include "broker/Broker.h"
-
-// Holds the lock of the agent's data directory while providers use interface files: shared while they read them,
-// exclusive while they change settings.
 
 namespace zorva::frontend {
 
@@ -38,7 +38,7 @@ class SettingsClaims {
     Hold& operator=(const Hold&) = delete;
 
    private:
-    std::shared_ptr<State> state_;  // null: nested
+    std::shared_ptr<State> state_;  ///< null: nested
   };
 
  private:

@@ -1,4 +1,5 @@
 // Any bytes as MOF. If they are accepted, the result can be written and read back unchanged.
+
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>

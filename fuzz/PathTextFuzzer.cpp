@@ -1,4 +1,5 @@
 // Any bytes as the text of an object path. If they are accepted, the path can be written and read back unchanged.
+
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>

@@ -1,5 +1,6 @@
 // Any bytes as the body of a request, through the whole server except HTTP and providers. The response must be XML that
 // a client can read.
+
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>

@@ -1,5 +1,6 @@
-// An object of the host for the companion providers: a class name and properties in order, the keys first.
 #pragma once
+
+// An object of the host for the companion providers: a class name and properties in order, the keys first.
 
 #include <cstdint>
 #include <string>
@@ -18,8 +19,8 @@ struct HostProperty {
 
 struct HostObject {
   const char* className;
-  std::vector<HostProperty> keys;        // all of them texts
-  std::vector<HostProperty> properties;  // without the keys
+  std::vector<HostProperty> keys;        ///< all of them texts
+  std::vector<HostProperty> properties;  ///< without the keys
 };
 
 }  // namespace zorva::host

@@ -1,4 +1,5 @@
 // The companion providers: the classes that the DNS associations refer to and that a bare CIM server lacks.
+
 #include <cmpidt.h>
 #include <cmpift.h>
 

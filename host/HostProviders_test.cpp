@@ -3,9 +3,9 @@
 #include <fstream>
 #include <set>
 
-#include "ProviderCall.h"
-#include "World.h"
 #include "host/SubnetMask.h"
+#include "tests/support/ProviderCall.h"
+#include "tests/support/World.h"
 
 extern "C" {
 CMPIInstanceMI* HostComputerSystemProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*);

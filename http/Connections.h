@@ -1,5 +1,8 @@
 #pragma once
 
+// The table of connections, with the phase of each one and its start. It serves to find and cut off slow and silent
+// clients. Thread-safe.
+
 #include <atomic>
 #include <chrono>
 #include <cstddef>
@@ -10,9 +13,6 @@
 #include <vector>
 
 #include "http/HttpLimits.h"
-
-// The table of connections, with the phase of each one and its start. It serves to find and cut off slow and silent
-// clients. Thread-safe.
 
 namespace zorva::http {
 
@@ -54,7 +54,7 @@ class Connection {
   std::atomic<std::uint64_t> state_;  ///< milliseconds of the steady clock, times four, and the phase
   std::atomic<bool> proven_ = false;
   std::atomic<std::size_t> held_ = 0;
-  // Under the table's lock.
+  /// Under the table's lock.
   int socket_;          ///< -1: closed
   bool isCut_ = false;  ///< shut down; the HTTP library is about to close it
   std::size_t place_ = 0;

@@ -1,5 +1,8 @@
 #pragma once
 
+// The interface between the server's HTTP side and its CIM side: a complete request, and a sink that takes the response
+// piece by piece (DSP0200 1.4).
+
 #include <cstdint>
 #include <functional>
 #include <stdexcept>
@@ -7,9 +10,6 @@
 #include <string_view>
 #include <utility>
 #include <vector>
-
-// The interface between the server's HTTP side and its CIM side: a complete request, and a sink that takes the response
-// piece by piece (DSP0200 1.4).
 
 namespace zorva::http {
 

@@ -1,11 +1,11 @@
 #pragma once
 
+// A response that is compressed while it is written (RFC 1952).
+
 #include <zlib.h>
 
 #include <string>
 #include <string_view>
-
-// A response that is compressed while it is written (RFC 1952).
 
 namespace zorva::http {
 

@@ -1,5 +1,12 @@
 #pragma once
 
+// One request and its response, shared by the event thread that owns the connection and the worker that answers.
+//
+// The connection is suspended while the worker computes. A response shorter than kWhole bytes is sent in one piece with
+// its length. A longer one is streamed in chunks: the worker fills `held_`, the event thread empties `outgoing_` and
+// swaps the two. The worker waits while it is more than kMostHeld ahead, so the unsent part is never more than a few
+// times that size.
+
 #include <microhttpd.h>
 #include <time.h>
 
@@ -18,13 +25,6 @@
 #include "http/Exchange.h"
 #include "http/Gzip.h"
 #include "http/RequestHead.h"
-
-// One request and its response, shared by the event thread that owns the connection and the worker that answers.
-//
-// The connection is suspended while the worker computes. A response shorter than kWhole bytes is sent in one piece with
-// its length. A longer one is streamed in chunks: the worker fills `held_`, the event thread empties `outgoing_` and
-// swaps the two. The worker waits while it is more than kMostHeld ahead, so the unsent part is never more than a few
-// times that size.
 
 namespace zorva::http {
 

@@ -1,9 +1,9 @@
 #pragma once
 
+// The limits on one client, and on all clients together.
+
 #include <chrono>
 #include <cstddef>
-
-// The limits on one client, and on all clients together.
 
 namespace zorva::http {
 

@@ -1,5 +1,10 @@
 #pragma once
 
+// HTTP/1.1 (RFC 9112) for a handler that answers requests: it accepts connections, reads whole requests, gives them to
+// worker threads and sends their responses, with back-pressure, limits, and a time limit for every wait.
+//
+// libmicrohttpd does the input and output in its own threads, which never wait for a provider.
+
 #include <sys/socket.h>
 
 #include <chrono>
@@ -9,11 +14,6 @@
 
 #include "http/Exchange.h"
 #include "http/HttpLimits.h"
-
-// HTTP/1.1 (RFC 9112) for a handler that answers requests: it accepts connections, reads whole requests, gives them to
-// worker threads and sends their responses, with back-pressure, limits, and a time limit for every wait.
-//
-// libmicrohttpd does the input and output in its own threads, which never wait for a provider.
 
 namespace zorva::http {
 

@@ -1,4 +1,5 @@
 // The HTTP side with the tests' own handlers, over real connections.
+
 #include "http/HttpServer.h"
 
 #include <gmock/gmock.h>

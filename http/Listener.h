@@ -1,13 +1,13 @@
 #pragma once
 
+// The sockets on which the server waits for clients. The server does not authenticate clients, so it listens only on
+// loopback addresses: 127.0.0.0/8 and ::1.
+
 #include <optional>
 #include <string>
 #include <vector>
 
 #include "util/FileDescriptor.h"
-
-// The sockets on which the server waits for clients. The server does not authenticate clients, so it listens only on
-// loopback addresses: 127.0.0.0/8 and ::1.
 
 namespace zorva::http {
 

@@ -1,11 +1,11 @@
 #pragma once
 
+// The server's lines in the agent's log, to which the providers of the process write too. Thread-safe; nothing here
+// throws.
+
 #include <string>
 
 #include "util/LogLevels.h"
-
-// The server's lines in the agent's log, to which the providers of the process write too. Thread-safe; nothing here
-// throws.
 
 namespace zorva::http {
 

@@ -1,14 +1,14 @@
 #pragma once
 
+// Checks a request before its body is read: RFC 9110, RFC 9112, and clause 7 of DSP0200 1.4 (CIM operations over HTTP).
+// Pure functions.
+
 #include <cstddef>
 #include <optional>
 #include <string>
 #include <string_view>
 
 #include "http/Exchange.h"
-
-// Checks a request before its body is read: RFC 9110, RFC 9112, and clause 7 of DSP0200 1.4 (CIM operations over HTTP).
-// Pure functions.
 
 namespace zorva::http {
 

@@ -1,5 +1,13 @@
 #pragma once
 
+// The threads that answer requests. They are started when they are needed and end when they are idle.
+//
+// A request that waits for its client to read the response does not count as running. Neither does one that hangs (see
+// HttpExchange::hangs): it keeps its thread, and others run beside it, up to the limit on requests. A request whose
+// provider does not return in time is abandoned: its client gets a response, another thread takes the place of its own,
+// and its thread ends when the provider returns. So neither slow clients nor hanging providers keep others from a
+// worker.
+
 #include <chrono>
 #include <functional>
 #include <memory>
@@ -8,14 +16,6 @@
 
 #include "http/HttpExchange.h"
 #include "http/HttpLimits.h"
-
-// The threads that answer requests. They are started when they are needed and end when they are idle.
-//
-// A request that waits for its client to read the response does not count as running. Neither does one that hangs (see
-// HttpExchange::hangs): it keeps its thread, and others run beside it, up to the limit on requests. A request whose
-// provider does not return in time is abandoned: its client gets a response, another thread takes the place of its own,
-// and its thread ends when the provider returns. So neither slow clients nor hanging providers keep others from a
-// worker.
 
 namespace zorva::http {
 

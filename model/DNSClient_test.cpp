@@ -4,6 +4,9 @@
 #include "RecordingLogger.h"
 #include "World.h"
 
+#include "tests/support/RecordingLogger.h"
+#include "tests/support/World.h"
+
 namespace ZV::Test {
 namespace {
 

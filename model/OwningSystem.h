@@ -1,5 +1,6 @@
-// Which system a network interface belongs to.
 #pragma once
+
+// Which system a network interface belongs to.
 
 #include <Instrumentation.h>
 
@@ -7,8 +8,8 @@
 
 namespace ZV {
 
-// The description of the node's grandparent: the product or "Computer" for the host, exactly "BMC" for the service
-// processor. The cursor itself does not move. Throws what the instrumentation throws.
+/// The description of the node's grandparent: the product or "Computer" for the host, exactly "BMC" for the service
+/// processor. The cursor itself does not move. Throws what the instrumentation throws.
 inline std::string owningSystemDescription(Instrumentation& cursor) {
   Instrumentation ancestor;
   ancestor.selectNode(cursor.getPathToParentNode());

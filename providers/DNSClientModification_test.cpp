@@ -1,4 +1,5 @@
 // ModifyInstance of ZORVA_DNSProtocolEndPoint, which writes to the nodes of the instrumentation tree.
+
 #include <filesystem>
 
 #include "providers/testing/ModificationTestSupport.h"

@@ -1,4 +1,5 @@
 // ZORVA_DNSProtocolEndPoint: the DNS client endpoints, one for each network interface. Instance and method provider.
+
 #include <cstring>
 
 #include "factory/DNSClientObjFactory.h"

@@ -3,6 +3,7 @@
 //
 // An endpoint and a setting data belong together where the InstanceID, split at "%", has the endpoint's name as its
 // second part. The enumerations skip an InstanceID with fewer parts; the association operations stop at it.
+
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSSettingDataObjects.h"
 #include "providers/AssociationOperation.h"

@@ -1,5 +1,6 @@
 // ZORVA_DNSGenEndPointElementSettingData: the host-wide DNS settings of every endpoint. Instance and association
 // provider, all objects come from the factory. Every endpoint has the settings: no key of either end is read.
+
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSGeneralSettingDataObjects.h"
 #include "providers/AssociationOperation.h"

@@ -1,6 +1,7 @@
 // ZORVA_DNSGenOrderedComponent: the host-wide DNS settings as a component of each IP assignment setting. Instance and
 // association provider; the IP assignment settings are served by another provider and read through the broker. No key
 // is compared: every pair belongs together.
+
 #include <stdexcept>
 
 #include "factory/DNSClientObjFactory.h"

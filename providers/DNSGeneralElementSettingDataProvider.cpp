@@ -3,6 +3,7 @@
 //
 // The enumerations pair a system with settings whose InstanceID contains its Name. The association operations compare
 // no key.
+
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSGeneralSettingDataObjects.h"
 #include "providers/AssociationOperation.h"

@@ -1,4 +1,5 @@
 // ModifyInstance of ZORVA_DNSGeneralSettingData, which writes to the file of the host's first interface.
+
 #include <filesystem>
 
 #include "providers/testing/ModificationTestSupport.h"

@@ -1,4 +1,5 @@
 // ZORVA_DNSGeneralSettingData: the DNS settings of the host as a whole. Instance provider.
+
 #include "factory/DNSGeneralSettingDataObjects.h"
 #include "factory/InstanceModification.h"
 #include "providers/ProviderFrame.h"

@@ -4,6 +4,7 @@
 // A system's Name is compared with an endpoint's SystemName. For the builder a part of the Name matches too; the names,
 // the associators and the references need the whole Name. The associators of a system also leave out the endpoints of
 // the service processor.
+
 #include <strings.h>
 
 #include "factory/DNSClientObjFactory.h"

@@ -4,6 +4,7 @@
 // An IP assignment's InstanceID is the DNS setting's, a "%" and one more part: the text before its last "%" must equal
 // the DNS setting's InstanceID. If it has no "%", the builder uses the whole text; the association operations stop at
 // it.
+
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSSettingDataObjects.h"
 #include "providers/AssociationOperation.h"

@@ -1,5 +1,6 @@
 // ZORVA_RemoteAccessAvailableToElement: every DNS server is available to every endpoint. Instance and association
 // provider; all objects come from the factory.
+
 #include "factory/DNSClientObjFactory.h"
 #include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"

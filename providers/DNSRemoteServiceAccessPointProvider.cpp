@@ -1,4 +1,5 @@
 // ZORVA_RemoteServiceAccessPoint: the configured DNS servers. Instance provider.
+
 #include "factory/DNSClientObjFactory.h"
 #include "providers/ProviderFrame.h"
 #include "providers/Results.h"

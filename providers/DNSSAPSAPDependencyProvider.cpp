@@ -4,6 +4,7 @@
 // There are two rules for matching. The enumerations, and the associators of an IP endpoint, compare whole names. The
 // references, and the associators of a DNS endpoint, compare the first part of the IP endpoint's name, up to a "_",
 // with the DNS endpoint's name: an interface's further addresses are named that way.
+
 #include "factory/DNSClientObjFactory.h"
 #include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"

@@ -1,4 +1,5 @@
 // ModifyInstance of ZORVA_DNSSettingData, which writes to the interface's file.
+
 #include <sys/stat.h>
 
 #include <filesystem>

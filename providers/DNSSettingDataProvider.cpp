@@ -1,4 +1,5 @@
 // ZORVA_DNSSettingData: the DNS settings of each network interface. Instance provider.
+
 #include "factory/DNSSettingDataObjects.h"
 #include "factory/InstanceModification.h"
 #include "providers/ProviderFrame.h"

@@ -1,8 +1,9 @@
+#pragma once
+
 // The frame of all twelve providers: function tables, create functions, and the operations that do no work.
 //
 // A provider's source includes this header once, defines its operations in namespace ZV as <Stem>_<Operation>, and ends
 // with the MI macros for the kinds that it serves. Each source has its own broker and its own tables.
-#pragma once
 
 #include <cmpidt.h>
 #include <cmpift.h>
@@ -17,13 +18,13 @@
 
 namespace ZV {
 
-// Set by the source's create functions, the last call wins; read by its operations.
+/// Set by the source's create functions, the last call wins; read by its operations.
 static const CMPIBroker* broker = nullptr;
 
 }  // namespace ZV
 
-// Operations that no provider implements: nothing is kept across calls, so there is nothing to clean up, and a client
-// can neither create nor delete an object.
+/// Operations that no provider implements: nothing is kept across calls, so there is nothing to clean up, and a client
+/// can neither create nor delete an object.
 #define ZV_REFUSED_INSTANCE_OPERATIONS(stem)                                                                        \
   static CMPIStatus stem##_Cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) { return kStatusOk; }          \
   static CMPIStatus stem##_CreateInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,                   \
@@ -39,7 +40,7 @@ static const CMPIBroker* broker = nullptr;
     return kNotSupported;                                                                                           \
   }
 
-// For the nine providers whose instances cannot be changed.
+/// For the nine providers whose instances cannot be changed.
 #define ZV_REFUSED_MODIFICATION(stem)                                                                 \
   static CMPIStatus stem##_ModifyInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,     \
                                           const CMPIObjectPath*, const CMPIInstance*, const char**) { \
@@ -49,7 +50,7 @@ static const CMPIBroker* broker = nullptr;
 #define ZV_ASSOCIATION_CLEANUP(stem) \
   static CMPIStatus stem##_AssociationCleanup(CMPIAssociationMI*, const CMPIContext*, CMPIBoolean) { return kStatusOk; }
 
-// The table of a provider's instance operations and the create function that returns it.
+/// The table of a provider's instance operations and the create function that returns it.
 #define ZV_INSTANCE_MI(prefix, stem)                                                                                 \
   namespace ZV {                                                                                                     \
   static constinit CMPIInstanceMIFT instMIFT__ = tableOf<CMPIInstanceMIFT>(                                          \

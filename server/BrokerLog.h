@@ -1,11 +1,11 @@
 #pragma once
 
+// Writes the lines of the broker and of the CIM operations to the server's log. Thread-safe; nothing here throws.
+
 #include <string>
 #include <string_view>
 
 #include "broker/Broker.h"
-
-// Writes the lines of the broker and of the CIM operations to the server's log. Thread-safe; nothing here throws.
 
 namespace zorva::server {
 

@@ -1,12 +1,12 @@
 #pragma once
 
+// The arguments of zorvacimd.
+
 #include <optional>
 #include <string>
 #include <variant>
 
 #include "server/Config.h"
-
-// The arguments of zorvacimd.
 
 namespace zorva::server {
 

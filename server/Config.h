@@ -1,5 +1,7 @@
 #pragma once
 
+// The configuration of zorvacimd: a TOML 1.0 file, and the command line's values, which replace the file's.
+
 #include <cstddef>
 #include <optional>
 #include <string>
@@ -9,8 +11,6 @@
 #include "http/HttpLimits.h"
 #include "http/Listener.h"
 #include "util/LogLevels.h"
-
-// The configuration of zorvacimd: a TOML 1.0 file, and the command line's values, which replace the file's.
 
 namespace zorva::server {
 
@@ -22,25 +22,25 @@ struct Config {
   std::optional<http::Addresses> addresses;
   int port = 5988;  ///< 0: a free one
 
-  // [limits]
+  /// [limits]
   http::HttpLimits limits;
   int nesting = 128;  ///< the deepest nesting of elements in a request
 
-  // [http]
+  /// [http]
   int threads = 2;  ///< for input and output; other threads wait for providers
 
-  // [pull]
+  /// [pull]
   int pullContexts = 100;        ///< enumerations that are open at once
   int pullClientContexts = 25;   ///< of these, of one client
   int pullSeconds = 60;          ///< how long an idle one is kept if the client gives no timeout
   int pullLongestSeconds = 600;  ///< the longest timeout that a client may request
   int pullMebibytes = 64;        ///< memory of all of them
 
-  // [agent]
+  /// [agent]
   std::string agentConfig;        ///< the agent's own configuration file; empty: the agent's default
   std::string providerDirectory;  ///< empty: beside the program
 
-  // [log]
+  /// [log]
   int logLevel = util::kLevelWarning;    ///< lines below it are dropped
   std::optional<std::string> logTarget;  ///< absent: the agent's default
 };

@@ -1,12 +1,12 @@
 #pragma once
 
+// The server as a process: its sockets, signals, log, and messages to the service manager.
+
 #include <functional>
 #include <memory>
 
 #include "broker/Broker.h"
 #include "server/CommandLine.h"
-
-// The server as a process: its sockets, signals, log, and messages to the service manager.
 
 namespace zorva::server {
 

@@ -1,4 +1,5 @@
 // The running zorvacimd: hostile requests, signals, inherited sockets, messages to the service manager.
+
 #include <arpa/inet.h>
 #include <fcntl.h>
 #include <gmock/gmock.h>

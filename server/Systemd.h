@@ -1,9 +1,9 @@
 #pragma once
 
-#include <string_view>
-
 // The messages between a service manager and this process: the protocols of sd_notify(3) and sd_listen_fds(3). They are
 // a datagram and two environment variables. Their library would load five others at every start.
+
+#include <string_view>
 
 namespace zorva::server {
 

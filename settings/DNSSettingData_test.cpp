@@ -4,6 +4,8 @@
 #include "RecordingLogger.h"
 #include "World.h"
 #include "settings/testing/FileAtEachLine.h"
+#include "tests/support/RecordingLogger.h"
+#include "tests/support/World.h"
 
 namespace ZV::Test {
 namespace {

@@ -1,15 +1,16 @@
 // The readers of interface files with another agent, whose property files keep the line feed at the end of a value. Its
 // class replaces the agent's own in this program.
+
 #include <PropertyFile.h>
 #include <StringConversion.h>
 #include <gmock/gmock.h>
 
 #include <fstream>
 
-#include "World.h"
 #include "agent/Seams.h"
 #include "settings/DNSGeneralSettingData.h"
 #include "settings/DNSSettingData.h"
+#include "tests/support/World.h"
 
 namespace ZV {
 

@@ -1,5 +1,6 @@
 // Compares every association of a host with three interfaces and a service processor with a table that was written by
 // hand. The provider library and the companions are loaded as a CIM server does it, and asked through the broker.
+
 #include <gmock/gmock.h>
 #include <stdlib.h>
 

@@ -1,5 +1,5 @@
 // The provider library as a CIM server uses it: a file that is loaded, searched for its create functions and unloaded.
-#include <ProviderCall.h>
+
 #include <dlfcn.h>
 #include <gmock/gmock.h>
 
@@ -11,6 +11,8 @@
 #include <memory>
 #include <set>
 #include <sstream>
+
+#include "tests/support/ProviderCall.h"
 
 namespace ZV::Test {
 namespace {

@@ -11,6 +11,9 @@
 
 #include "schema/ClassRepository.h"
 #include "schema/Schema.h"
+#include "tests/support/ProviderCall.h"
+#include "tests/support/RecordingBroker.h"
+#include "tests/support/World.h"
 
 namespace ZV::Test {
 namespace {

@@ -1,5 +1,6 @@
-// The format of every line that the library writes to the agent's logger.
 #pragma once
+
+// The format of every line that the library writes to the agent's logger.
 
 #include <ZALogger.h>
 
@@ -13,17 +14,17 @@
 
 namespace ZV {
 
-// Selects the format of a line. A value that is not listed gives the entering format.
+/// Selects the format of a line. A value that is not listed gives the entering format.
 enum MessageType : int { MSG_ENTERING = 0, MSG_EXITING = 1, MSG_METHOD = 2, MSG_MESSAGE = 3 };
 
-// The levels that the library writes at. The library tests no level: the logger drops lines.
+/// The levels that the library writes at. The library tests no level: the logger drops lines.
 enum LogLevel : int {
   LOG_LEVEL_FLOW = zorva::util::kLevelFlow,
   LOG_LEVEL_DETAIL = zorva::util::kLevelDetail,
   LOG_LEVEL_ERROR = zorva::util::kLevelError,
 };
 
-// A longer line is truncated.
+/// A longer line is truncated.
 constexpr std::size_t kMessageBufferSize = 512;
 
 // The four formatters. Each returns its own buffer, one for each thread. A line is valid until the same formatter runs
@@ -80,7 +81,7 @@ inline const char* trace(const char* name, const char* file, unsigned int line, 
   return messageBuffer;
 }
 
-// A statement's place in its source. The default argument of a function is the place of the statement that calls it.
+/// A statement's place in its source. The default argument of a function is the place of the statement that calls it.
 struct Place {
   const char* file;
   unsigned int line;
@@ -89,17 +90,17 @@ struct Place {
   }
 };
 
-// The function that a line names, and its source file and line.
+/// The function that a line names, and its source file and line.
 struct LogSite {
   const char* function;
   const char* file;
   unsigned int line;
 };
 #define ZV_HERE ZV_HERE_IN(static_cast<const char*>(__func__))
-// For a lambda: its own name would replace the function's.
+/// For a lambda: its own name would replace the function's.
 #define ZV_HERE_IN(function) (::ZV::LogSite{function, __FILE__, __LINE__})
 
-// A log pair: the same line to the log and then to the trace. format is called for each of the two.
+/// A log pair: the same line to the log and then to the trace. format is called for each of the two.
 template <typename Format>
 void logPair(const std::string& logger, const LogSite& site, int level, Format format) {
   {
@@ -130,7 +131,8 @@ inline void logVariable(const std::string& logger, const LogSite& site, const ch
   logPair(logger, site, LOG_LEVEL_DETAIL, [&] { return trace(name, site.file, site.line, value); });
 }
 
-// One label or value of a parameter list: text unchanged, a bool as the stream prints it, anything else as its address.
+/// One label or value of a parameter list: text unchanged, a bool as the stream prints it, anything else as its
+/// address.
 template <typename T>
 void appendParameter(ZALog::ZAMessageBuffer& buffer, const T& labelOrValue) {
   if constexpr (std::is_same_v<T, bool>) {
@@ -143,8 +145,8 @@ void appendParameter(ZALog::ZAMessageBuffer& buffer, const T& labelOrValue) {
   }
 }
 
-// A line with a parameter list, labels and values alternating: logEntry(logger, ZV_HERE, " broker=", broker, " ref=",
-// ref).
+/// A line with a parameter list, labels and values alternating: logEntry(logger, ZV_HERE, " broker=", broker, " ref=",
+/// ref).
 template <typename... LabelsAndValues>
 void logWithParameters(const std::string& logger, const LogSite& site, MessageType type,
                        const LabelsAndValues&... labelsAndValues) {
@@ -165,8 +167,8 @@ void logExit(const std::string& logger, const LogSite& site, const LabelsAndValu
   logWithParameters(logger, site, MSG_EXITING, labelsAndValues...);
 }
 
-// Writes the entry line of a function when it is constructed, and the exit line with the same parameters when exit() is
-// called.
+/// Writes the entry line of a function when it is constructed, and the exit line with the same parameters when exit()
+/// is called.
 template <typename... LabelsAndValues>
 class FlowLog {
  public:
@@ -191,8 +193,8 @@ FlowLog(const std::string&, const LogSite&, LabelsAndValues...) -> FlowLog<Label
 inline constexpr const char* kBanner = "==============================================================================";
 static_assert(std::char_traits<char>::length(kBanner) == 78);
 
-// Frame a provider operation in the log. The text of the lines names the operation; the place that the logger gets is
-// in this header.
+/// Frame a provider operation in the log. The text of the lines names the operation; the place that the logger gets is
+/// in this header.
 inline void markProviderEntry(const std::string& logger, const char* function, const char* file, unsigned int line) {
   logPair(logger, ZV_HERE, LOG_LEVEL_DETAIL, [] { return kBanner; });
   logPair(logger, ZV_HERE, LOG_LEVEL_DETAIL, [&] { return trace(function, file, line, MSG_ENTERING); });

@@ -1,11 +1,11 @@
 #pragma once
 
+// The result of a function that its caller must expect to fail: the value or the error. Each folder has its own types
+// of errors, which say what is wrong and where.
+
 #include <tl/expected.hpp>
 #include <type_traits>
 #include <utility>
-
-// The result of a function that its caller must expect to fail: the value or the error. Each folder has its own types
-// of errors, which say what is wrong and where.
 
 namespace zorva {
 

@@ -1,5 +1,6 @@
-// Owner of a file descriptor.
 #pragma once
+
+// Owner of a file descriptor.
 
 #include <unistd.h>
 
@@ -7,7 +8,7 @@
 
 namespace zorva::util {
 
-// Closes the descriptor at its end; -1 is none.
+/// Closes the descriptor at its end; -1 is none.
 class FileDescriptor {
  public:
   FileDescriptor() = default;
@@ -21,7 +22,7 @@ class FileDescriptor {
 
   explicit operator bool() const { return descriptor_ >= 0; }
   int get() const { return descriptor_; }
-  // Gives the descriptor away.
+  /// Gives the descriptor away.
   int release() { return std::exchange(descriptor_, -1); }
   void reset() {
     if (descriptor_ >= 0) ::close(release());

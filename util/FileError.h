@@ -1,5 +1,6 @@
-// Throws the failure of a system call on a file.
 #pragma once
+
+// Throws the failure of a system call on a file.
 
 #include <cerrno>
 #include <stdexcept>
@@ -8,7 +9,7 @@
 
 namespace zorva::util {
 
-// Throws std::runtime_error with one line: the path, what failed, and what errno means.
+/// Throws std::runtime_error with one line: the path, what failed, and what errno means.
 [[noreturn]] inline void throwFileError(const std::string& path, const char* what) {
   throw std::runtime_error(path + ": " + what + ": " + std::generic_category().message(errno));
 }

@@ -1,7 +1,8 @@
+#pragma once
+
 // CIM names (of classes, properties, methods, parameters, qualifiers, namespaces) are matched without regard to the
 // case of ASCII letters (DSP0004 5.1.2); other characters are compared as they are. Header fields and host names
 // likewise.
-#pragma once
 
 #include <cstddef>
 #include <cstdint>
@@ -12,7 +13,7 @@ namespace zorva::util {
 
 constexpr char lowerAscii(char c) noexcept { return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c; }
 
-// Whether two names are the same name.
+/// Whether two names are the same name.
 constexpr bool sameName(std::string_view a, std::string_view b) noexcept {
   if (a.size() != b.size()) return false;
   for (std::size_t i = 0; i < a.size(); ++i) {
@@ -21,14 +22,14 @@ constexpr bool sameName(std::string_view a, std::string_view b) noexcept {
   return true;
 }
 
-// A hash that is equal for two spellings of one name (FNV-1a over the small letters).
+/// A hash that is equal for two spellings of one name (FNV-1a over the small letters).
 constexpr std::uint32_t nameHash(std::string_view name) noexcept {
   std::uint32_t hash = 2166136261U;
   for (const char c : name) hash = (hash ^ static_cast<unsigned char>(lowerAscii(c))) * 16777619U;
   return hash;
 }
 
-// Hash, equality and order of containers keyed by names; all take a std::string_view without making a string of it.
+/// Hash, equality and order of containers keyed by names; all take a std::string_view without making a string of it.
 struct NameHash {
   using is_transparent = void;
   std::size_t operator()(std::string_view name) const noexcept { return nameHash(name); }

@@ -1,5 +1,6 @@
-// Reads a small regular file.
 #pragma once
+
+// Reads a small regular file.
 
 #include <cstddef>
 #include <string>
@@ -7,20 +8,20 @@
 namespace zorva::util {
 
 struct FileText {
-  std::string text;        // the content, at most the limit
-  bool truncated = false;  // the file is longer
-  int error = 0;           // errno of the failure, 0 if there was none; EINVAL if it is not a regular file
+  std::string text;        ///< the content, at most the limit
+  bool truncated = false;  ///< the file is longer
+  int error = 0;           ///< errno of the failure, 0 if there was none; EINVAL if it is not a regular file
 };
 
-// Reads a file up to limit bytes. Symbolic links are followed. A file that is not regular is not read, so this never
-// blocks. Throws only std::bad_alloc.
+/// Reads a file up to limit bytes. Symbolic links are followed. A file that is not regular is not read, so this never
+/// blocks. Throws only std::bad_alloc.
 FileText readFile(const std::string& path, std::size_t limit);
 
-// Whether an error number of FileText is temporary: no descriptor or memory was left, or the disk failed. A later read
-// may succeed, and no event reports that.
+/// Whether an error number of FileText is temporary: no descriptor or memory was left, or the disk failed. A later read
+/// may succeed, and no event reports that.
 bool mayPass(int error);
 
-// The text of an error number of FileText.
+/// The text of an error number of FileText.
 std::string fileErrorText(int error);
 
 }  // namespace zorva::util

@@ -1,6 +1,7 @@
+#pragma once
+
 // Reads configurations in TOML 1.0. What a person has written is checked to the last key, and an error says where it
 // is.
-#pragma once
 
 #include <climits>
 #include <cstdint>
@@ -14,14 +15,14 @@
 
 namespace zorva::util {
 
-// what() says what is wrong.
+/// what() says what is wrong.
 class TomlError : public std::runtime_error {
  public:
   TomlError(int line, std::string key, const std::string& problem)
       : std::runtime_error(problem), line_(line), key_(std::move(key)) {}
 
-  int line() const { return line_; }               // from 1; 0 is unknown
-  const std::string& key() const { return key_; }  // "table.key"; empty where no key is to blame
+  int line() const { return line_; }               ///< from 1; 0 is unknown
+  const std::string& key() const { return key_; }  ///< "table.key"; empty where no key is to blame
 
  private:
   int line_;
@@ -30,13 +31,13 @@ class TomlError : public std::runtime_error {
 
 class TomlDocument {
  public:
-  // Throws TomlError for text that is no TOML.
+  /// Throws TomlError for text that is no TOML.
   explicit TomlDocument(const std::string& text);
   ~TomlDocument();
   TomlDocument(const TomlDocument&) = delete;
   TomlDocument& operator=(const TomlDocument&) = delete;
 
-  // Throws TomlError for anything at the top but tables and keys of these names.
+  /// Throws TomlError for anything at the top but tables and keys of these names.
   void refuseAllBut(std::initializer_list<std::string_view> names) const;
 
  private:
@@ -45,8 +46,8 @@ class TomlDocument {
   std::unique_ptr<Parsed> parsed_;
 };
 
-// One table of a document, which must outlive it. A function that takes a value leaves the variable as it is where the
-// table, or the key in it, is not there. All throw TomlError.
+/// One table of a document, which must outlive it. A function that takes a value leaves the variable as it is where the
+/// table, or the key in it, is not there. All throw TomlError.
 class TomlTable {
  public:
   TomlTable(const TomlDocument& document, std::string name);
@@ -59,10 +60,10 @@ class TomlTable {
   void take(const char* key, int& value);
   void take(const char* key, int& value, int least, int most);
 
-  // A list of texts that is not empty; `expected` describes it in the error.
+  /// A list of texts that is not empty; `expected` describes it in the error.
   void take(const char* key, std::optional<std::vector<std::string>>& value, const char* expected);
 
-  // Refuses the keys that were not taken.
+  /// Refuses the keys that were not taken.
   void finish() const;
 
   [[noreturn]] void fail(const char* key, const std::string& problem) const;
@@ -75,11 +76,11 @@ class TomlTable {
 
   const std::string name_;
   struct Table;
-  std::unique_ptr<Table> table_;  // null where the document has none of that name
+  std::unique_ptr<Table> table_;  ///< null where the document has none of that name
   std::vector<std::string_view> known_;
 };
 
-// A path that is not absolute is taken from the directory of the file that names it. The empty path stays empty.
+/// A path that is not absolute is taken from the directory of the file that names it. The empty path stays empty.
 std::string pathFrom(const std::string& file, const std::string& path);
 
 }  // namespace zorva::util

@@ -1,4 +1,5 @@
 // The cost of checking and of reading the live host, compared with the system calls that are needed for it.
+
 #include <arpa/inet.h>
 #include <benchmark/benchmark.h>
 #include <fcntl.h>

@@ -1,4 +1,5 @@
 // The cost of a line that is not logged: its text is made twice and then dropped.
+
 #include <benchmark/benchmark.h>
 
 #include <array>

@@ -1,11 +1,12 @@
 // A provider that does almost no work itself, so that the cost of the server and its broker is measured: each instance
 // has fifteen properties, four of them keys, of the types that a protocol endpoint has.
+
+#include <cmpidt.h>
+#include <cmpift.h>
+#include <cmpimacs.h>
+
 #include <charconv>
 #include <cstring>
-
-#include "cmpidt.h"
-#include "cmpift.h"
-#include "cmpimacs.h"
 
 namespace {
 

@@ -1,4 +1,5 @@
 // zorvacimd with the classes of the benchmark instead of its own.
+
 #include <stdexcept>
 #include <string>
 

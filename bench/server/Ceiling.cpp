@@ -5,6 +5,7 @@
 //   ceiling FILE THREADS direct      the event threads answer by themselves
 //
 // Answers each request with the file's bytes, prints its port, ends with standard input.
+
 #include <arpa/inet.h>
 #include <microhttpd.h>
 #include <netinet/in.h>

@@ -1,5 +1,9 @@
 #pragma once
 
+// The inside of a broker: users see the class Broker, providers see the function tables. Safe on any thread.
+
+#include <cmpift.h>
+
 #include <memory>
 #include <mutex>
 #include <string>
@@ -11,9 +15,6 @@
 #include "broker/core/ProviderRegistry.h"
 #include "broker/objects/BlockCache.h"
 #include "broker/objects/ClassTable.h"
-#include "cmpift.h"
-
-// The inside of a broker: users see the class Broker, providers see the function tables. Safe on any thread.
 
 namespace zorva::broker {
 
@@ -62,10 +63,10 @@ class BrokerCore {
   ProviderRegistry registry_;
   LogHook log_;
   ClaimHook claim_;
-  std::mutex threadsMutex_;  // guards the next two members
+  std::mutex threadsMutex_;  ///< guards the next two members
   std::vector<std::unique_ptr<Arena>> prepared_;
   std::vector<std::unique_ptr<Attached>> attached_;
-  ProviderLoader loader_;  // last: its destructor calls providers, which may need all members above
+  ProviderLoader loader_;  ///< last: its destructor calls providers, which may need all members above
 };
 
 /// The function tables of every broker.

@@ -1,5 +1,7 @@
 #pragma once
 
+// The options of a broker: its registry, and its owner's hooks for log lines and claims.
+
 #include <functional>
 #include <memory>
 #include <string>
@@ -9,8 +11,6 @@
 #include "broker/core/ProviderRegistry.h"
 #include "broker/objects/Value.h"
 #include "util/LogLevels.h"
-
-// The options of a broker: its registry, and its owner's hooks for log lines and claims.
 
 namespace zorva::broker {
 

@@ -60,7 +60,7 @@ ProviderLoader::~ProviderLoader() {
   }
 }
 
-template <class Mi>
+template <typename Mi>
 bool ProviderLoader::cleanUp(Provider& provider, std::atomic<const Mi*> Provider::*slot) noexcept {
   const Mi* mi = (provider.*slot).load();
   if (mi == nullptr || mi->ft->cleanup == nullptr) return false;
@@ -100,7 +100,7 @@ ProviderLoader::Library* ProviderLoader::open(const std::string& name, Status& s
   return nullptr;
 }
 
-template <class Mi>
+template <typename Mi>
 const Mi* ProviderLoader::find(const ProviderEntry& entry, std::atomic<const Mi*> Provider::*slot, MiKind kind,
                                Status& status) {
   Provider& provider = providerOf(entry);
@@ -151,7 +151,7 @@ void* ProviderLoader::findFunction(const Provider& provider, const std::string& 
   return found;
 }
 
-template <class Mi>
+template <typename Mi>
 const Mi* ProviderLoader::make(const Provider& provider, const char* kind, Status& status) {
   const std::string function = provider.prefix + "_Create_" + kind;
   using Create = Mi* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);

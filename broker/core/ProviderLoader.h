@@ -1,5 +1,12 @@
 #pragma once
 
+// Loads a provider library when the first request needs it. All MIs of a provider are made once and together: its
+// create functions store the broker where its operations read it without a lock, so no create function may run once
+// another MI is in use. Safe on any thread.
+
+#include <cmpidt.h>
+#include <cmpift.h>
+
 #include <atomic>
 #include <functional>
 #include <memory>
@@ -11,12 +18,6 @@
 #include "broker/core/BrokerOptions.h"
 #include "broker/core/ProviderRegistry.h"
 #include "broker/objects/Value.h"
-#include "cmpidt.h"
-#include "cmpift.h"
-
-// Loads a provider library when the first request needs it. All MIs of a provider are made once and together: its
-// create functions store the broker where its operations read it without a lock, so no create function may run once
-// another MI is in use. Safe on any thread.
 
 namespace zorva::broker {
 
@@ -59,7 +60,7 @@ class ProviderLoader {
     std::string library;
     std::string nameSpace;
     unsigned kinds = 0;
-    bool isBeingMade = false;  // guarded by mutex_
+    bool isBeingMade = false;  ///< guarded by mutex_
     std::atomic<const CMPIInstanceMI*> instance = nullptr;
     std::atomic<const CMPIAssociationMI*> association = nullptr;
     std::atomic<const CMPIMethodMI*> method = nullptr;
@@ -71,18 +72,18 @@ class ProviderLoader {
   void* findFunction(const Provider& provider, const std::string& function, Status& status);
   /// Makes the provider's missing kinds and publishes it. `status` is that of the kind `wanted`.
   void makeAll(Provider& provider, MiKind wanted, Status& status);
-  template <class Mi>
+  template <typename Mi>
   const Mi* make(const Provider& provider, const char* kind, Status& status);
-  template <class Mi>
+  template <typename Mi>
   const Mi* find(const ProviderEntry& entry, std::atomic<const Mi*> Provider::*slot, MiKind kind, Status& status);
-  template <class Mi>
+  template <typename Mi>
   bool cleanUp(Provider& provider, std::atomic<const Mi*> Provider::*slot) noexcept;
 
   const LoaderHost host_;
   const std::string directory_;
   const std::vector<LinkedFunction> linked_;
   std::vector<std::unique_ptr<Provider>> providers_;
-  // A create function may call up into the broker, which may need another provider.
+  /// A create function may call up into the broker, which may need another provider.
   std::recursive_mutex mutex_;
   std::unordered_map<std::string, std::unique_ptr<Library>> libraries_;
 };

@@ -1,10 +1,10 @@
 #pragma once
 
+// Which provider serves which class. A registry is filled by one thread, then only read.
+
 #include <string>
 #include <string_view>
 #include <vector>
-
-// Which provider serves which class. A registry is filled by one thread, then only read.
 
 namespace zorva::broker {
 

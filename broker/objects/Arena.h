@@ -1,17 +1,17 @@
 #pragma once
 
+// The memory of one request. Allocation moves a pointer; all memory is freed at once, with the arena. Objects in it
+// have no destructor.
+//
+// An arena belongs to one thread at a time. share() makes allocation safe for several threads, at the cost of a lock
+// each time.
+
 #include <cstddef>
 #include <mutex>
 #include <new>
 #include <string_view>
 #include <type_traits>
 #include <utility>
-
-// The memory of one request. Allocation moves a pointer; all memory is freed at once, with the arena. Objects in it
-// have no destructor.
-//
-// An arena belongs to one thread at a time. share() makes allocation safe for several threads, at the cost of a lock
-// each time.
 
 namespace zorva::broker {
 
@@ -50,14 +50,14 @@ class Arena {
     return take(size);
   }
 
-  template <class T, class... Args>
+  template <typename T, typename... Args>
   T* make(Args&&... args) {
     static_assert(std::is_trivially_destructible_v<T> && alignof(T) <= kAlignment);
     return new (allocate(sizeof(T))) T(std::forward<Args>(args)...);
   }
 
   /// `count` values of T, value-initialised.
-  template <class T>
+  template <typename T>
   T* makeArray(std::size_t count) {
     static_assert(std::is_trivially_destructible_v<T> && alignof(T) <= kAlignment);
     if (count > kMost / sizeof(T)) throw std::bad_alloc();
@@ -84,7 +84,7 @@ class Arena {
 
  private:
   static constexpr std::size_t kAlignment = 8;
-  // No object of a request is larger: a larger size is an error of the caller.
+  /// No object of a request is larger: a larger size is an error of the caller.
   static constexpr std::size_t kMost = static_cast<std::size_t>(1) << 30;
 
   void* take(std::size_t size) {
@@ -100,7 +100,7 @@ class Arena {
 
   const ClassTable* classes_;
   BlockCache* cache_;
-  std::size_t next_;  // of the next block
+  std::size_t next_;  ///< of the next block
   char* position_ = nullptr;
   char* end_ = nullptr;
   MemoryBlock* blocks_ = nullptr;

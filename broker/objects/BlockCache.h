@@ -1,10 +1,10 @@
 #pragma once
 
-#include <cstddef>
-#include <mutex>
-
 // Memory blocks that arenas gave back, kept for the next request: memory that was used before costs no page faults.
 // Safe on any thread.
+
+#include <cstddef>
+#include <mutex>
 
 namespace zorva::broker {
 

@@ -1,5 +1,8 @@
 #pragma once
 
+// The schema as the broker's objects need it: names as CMPI texts, types as CMPI types, and fast look-ups. A class is
+// converted at its first look-up.
+
 #include <atomic>
 #include <cstdint>
 #include <deque>
@@ -11,9 +14,6 @@
 
 #include "broker/objects/Objects.h"
 #include "schema/ClassRepository.h"
-
-// The schema as the broker's objects need it: names as CMPI texts, types as CMPI types, and fast look-ups. A class is
-// converted at its first look-up.
 
 namespace zorva::broker {
 
@@ -54,13 +54,13 @@ class ClassInfo {
  private:
   const schema::Class& declared_;
   StringObject nameObject_;
-  std::deque<StringObject> names_;  // a deque: other objects point at the elements
+  std::deque<StringObject> names_;  ///< a deque: other objects point at the elements
   std::vector<PropertyInfo> properties_;
   std::vector<const PropertyInfo*> keys_;
-  // Open addressing: index + 1 of the property whose name hashes here, 0 for none. At most half full.
+  /// Open addressing: index + 1 of the property whose name hashes here, 0 for none. At most half full.
   std::vector<std::uint16_t> buckets_;
   mutable std::atomic<std::uint32_t> usualSize_ = 0;
-  // Index + 1 of the property that came after each one (0: before the first) the last time; 0 for none.
+  /// Index + 1 of the property that came after each one (0: before the first) the last time; 0 for none.
   mutable std::vector<std::atomic<std::uint16_t>> successors_;
 };
 

@@ -22,7 +22,7 @@ void assignText(Scalar& scalar, std::string_view text) {
   }
 }
 
-template <class T>
+template <typename T>
 T& held(Scalar& scalar) {
   if (auto* boxed = std::get_if<Boxed<T>>(&scalar)) return **boxed;
   return *scalar.emplace<Boxed<T>>();
@@ -304,7 +304,7 @@ class ScalarMaker {
     return mismatch(quotedText(text));
   }
 
-  template <class Number>
+  template <typename Number>
   static bool reads(const std::string& text, Number& number) {
     const char* begin = text.data() + (!text.empty() && text[0] == '+' ? 1 : 0);
     const char* end = text.data() + text.size();

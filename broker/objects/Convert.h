@@ -1,15 +1,15 @@
 #pragma once
 
+// Converts between the plain values of clients and the CMPI objects of providers.
+//
+// The functions that fill a plain value reuse its memory: filling the same value again and again allocates almost
+// nothing.
+
 #include <string_view>
 
 #include "broker/objects/ClassTable.h"
 #include "broker/objects/Objects.h"
 #include "broker/objects/Value.h"
-
-// Converts between the plain values of clients and the CMPI objects of providers.
-//
-// The functions that fill a plain value reuse its memory: filling the same value again and again allocates almost
-// nothing.
 
 namespace zorva::broker {
 

@@ -57,7 +57,7 @@ CMPIrc importText(Arena& arena, const char* text, CMPIData& data) {
 
 /// Puts `object`, made from `handle`, into `data`. A null handle gives no value; a handle without an object is an
 /// error.
-template <class Handle, class Object>
+template <typename Handle, typename Object>
 CMPIrc place(const Handle* handle, Object* object, Handle* CMPIValue::*member, CMPIData& data) noexcept {
   if (handle == nullptr) return CMPI_RC_OK;
   if (object == nullptr) return CMPI_RC_ERR_INVALID_HANDLE;

@@ -1,9 +1,10 @@
 #pragma once
 
-#include "broker/objects/Objects.h"
-#include "cmpidt.h"
-
 // Copies the values that a provider passes into data of our own, in the arena of the object that takes them.
+
+#include <cmpidt.h>
+
+#include "broker/objects/Objects.h"
 
 namespace zorva::broker {
 
@@ -33,7 +34,7 @@ CMPIrc fitData(const PropertyInfo& property, CMPIData& data) noexcept;
 CMPIData nullData(CMPIType type, CMPIValueState state = CMPI_nullValue) noexcept;
 CMPIData stringData(StringObject* text) noexcept;
 
-// Copies of whole objects. An immutable object in the same arena is not copied.
+/// Copies of whole objects. An immutable object in the same arena is not copied.
 StringObject* copyString(Arena& arena, const StringObject& text);
 DateTimeObject* copyDateTime(Arena& arena, const DateTimeObject& dateTime);
 ArrayObject* copyArray(Arena& arena, const ArrayObject& array);
@@ -42,8 +43,8 @@ InstanceObject* copyInstance(Arena& arena, const InstanceObject& instance);
 ArgsObject* copyArgs(Arena& arena, const ArgsObject& args);
 void copyEntries(Arena& arena, const EntryList& from, EntryList& to);
 
-// The object of a handle as an object of ours in `arena` (an object of ours is copied as above). Null if the handle is
-// null, has no object, or is of the wrong kind; or if another broker's object cannot be read.
+/// The object of a handle as an object of ours in `arena` (an object of ours is copied as above). Null if the handle is
+/// null, has no object, or is of the wrong kind; or if another broker's object cannot be read.
 StringObject* adoptString(Arena& arena, const CMPIString* handle);
 DateTimeObject* adoptDateTime(Arena& arena, const CMPIDateTime* handle);
 ArrayObject* adoptArray(Arena& arena, const CMPIArray* handle);

@@ -1,13 +1,13 @@
 #pragma once
 
+// CIM's date-times as text (DSP0004 5.2.4): a point in time is yyyymmddhhmmss.mmmmmmsutc (utc in minutes, s its sign),
+// an interval ddddddddhhmmss.mmmmmm:000, 25 characters each. Unknown fields are asterisks and count as zero (as one in
+// month and day). These functions keep no state.
+
 #include <cstdint>
 #include <optional>
 #include <string>
 #include <string_view>
-
-// CIM's date-times as text (DSP0004 5.2.4): a point in time is yyyymmddhhmmss.mmmmmmsutc (utc in minutes, s its sign),
-// an interval ddddddddhhmmss.mmmmmm:000, 25 characters each. Unknown fields are asterisks and count as zero (as one in
-// month and day). These functions keep no state.
 
 namespace zorva::broker {
 

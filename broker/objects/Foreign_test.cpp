@@ -1,9 +1,10 @@
+// Objects of another broker in the process: our broker reads them through their own tables.
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include <string>
 
-#include "RecordingBroker.h"
 #include "broker/Broker.h"
 #include "broker/core/BrokerCore.h"
 #include "broker/objects/Data.h"
@@ -12,8 +13,7 @@
 #include "broker/requests/Request.h"
 #include "broker/requests/Result.h"
 #include "broker/testing/TestClasses.h"
-
-// Objects of another broker in the process: our broker reads them through their own tables.
+#include "tests/support/RecordingBroker.h"
 
 namespace zorva::broker {
 namespace {

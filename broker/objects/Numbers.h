@@ -1,11 +1,11 @@
 #pragma once
 
+// Numbers in CMPI data, by the data's type.
+
+#include <cmpidt.h>
+
 #include <cstdint>
 #include <limits>
-
-#include "cmpidt.h"
-
-// Numbers in CMPI data, by the data's type.
 
 namespace zorva::broker {
 
@@ -45,7 +45,7 @@ inline std::int64_t signedOf(const CMPIData& data) noexcept {
   }
 }
 
-template <class Narrow, class Wide>
+template <typename Narrow, typename Wide>
 bool placeNumber(Narrow& member, Wide number) noexcept {
   member = static_cast<Narrow>(number);
   return static_cast<Wide>(member) == number;

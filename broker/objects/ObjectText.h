@@ -1,10 +1,10 @@
 #pragma once
 
+// CMPI objects as text for people: the result of toString.
+
 #include <string>
 
 #include "broker/objects/Objects.h"
-
-// CMPI objects as text for people: the result of toString.
 
 namespace zorva::broker {
 

@@ -1,14 +1,5 @@
 #pragma once
 
-#include <cstddef>
-#include <cstdint>
-#include <string_view>
-
-#include "broker/objects/Arena.h"
-#include "cmpidt.h"
-#include "cmpift.h"
-#include "cmpimacs.h"
-
 // The CMPI objects of this broker. Each begins with the handle that CMPI publishes (hdl, ft), hdl pointing at the
 // object itself. A handle of ours is recognized by its function table: own<InstanceObject>(handle) is the object of the
 // handle, or null if the handle is null, of another kind, or another broker's.
@@ -16,6 +7,16 @@
 // Objects live in an arena and have no destructor. Texts and date-times are immutable, so objects of one arena share
 // them. All others are copied when they become part of another object. A null arena pointer marks an object that lives
 // as long as the broker.
+
+#include <cmpidt.h>
+#include <cmpift.h>
+#include <cmpimacs.h>
+
+#include <cstddef>
+#include <cstdint>
+#include <string_view>
+
+#include "broker/objects/Arena.h"
 
 namespace zorva::schema {
 struct ClassProperty;
@@ -125,7 +126,7 @@ class EntryList {
   Entry* entries_ = nullptr;
   std::uint32_t size_ = 0;
   std::uint32_t capacity_ = 0;
-  mutable bool shared_ = false;  // another list may have the same entries
+  mutable bool shared_ = false;  ///< another list may have the same entries
 };
 
 struct PathObject : CMPIObjectPath {
@@ -264,7 +265,7 @@ struct ErrorObject : CMPIError {
 
   Arena* arena;
   Codes codes;
-  StringObject* otherType = nullptr;  // null texts and arrays: not set
+  StringObject* otherType = nullptr;  ///< null texts and arrays: not set
   StringObject* owningEntity = nullptr;
   StringObject* messageId = nullptr;
   StringObject* message = nullptr;
@@ -283,14 +284,14 @@ bool isOwnTable(const void* table) noexcept;
 const char* typeNameOf(const void* object) noexcept;
 
 /// The object of a handle of this broker, else null. Constness is dropped: CMPI's own setters take const handles.
-template <class Object>
+template <typename Object>
 Object* own(const typename Object::Handle* handle) noexcept {
   if (handle == nullptr || handle->ft != &Object::table || handle->hdl == nullptr) return nullptr;
   return const_cast<Object*>(static_cast<const Object*>(handle));
 }
 
 /// True for a handle that another broker in the process made: it is used through its own table.
-template <class Handle>
+template <typename Handle>
 bool isForeign(const Handle* handle) noexcept {
   return handle != nullptr && handle->hdl != nullptr && handle->ft != nullptr && !isOwnTable(handle->ft);
 }

@@ -1,3 +1,5 @@
+// CMPI objects as a provider sees them: only through their function tables.
+
 #include "broker/objects/Objects.h"
 
 #include <gmock/gmock.h>
@@ -13,8 +15,6 @@
 #include "broker/objects/ObjectText.h"
 #include "broker/objects/Scope.h"
 #include "broker/testing/TestClasses.h"
-
-// CMPI objects as a provider sees them: only through their function tables.
 
 namespace zorva::broker {
 namespace {
@@ -38,7 +38,7 @@ class ObjectsTest : public ::testing::Test {
   static CMPIrc set(CMPIInstance* to, const char* name, const char* text) {
     return to->ft->setProperty(to, name, reinterpret_cast<const CMPIValue*>(text), CMPI_chars).rc;
   }
-  template <class Number>
+  template <typename Number>
   static CMPIrc set(CMPIInstance* to, const char* name, Number number, CMPIType type) {
     return to->ft->setProperty(to, name, reinterpret_cast<const CMPIValue*>(&number), type).rc;
   }

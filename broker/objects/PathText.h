@@ -1,12 +1,5 @@
 #pragma once
 
-#include <cstddef>
-#include <string>
-#include <string_view>
-
-#include "broker/objects/Value.h"
-#include "util/Expected.h"
-
 // Object paths as people type them, the untyped form of DSP0004 8.2 and DSP0207:
 //
 //   ZORVA_DNSProtocolEndPoint.Name="eth0",SystemName="host1"
@@ -16,6 +9,13 @@
 // A key's value is a text in double quotes, in which \" \\ \n \t \r \b \f \xHHHH have the same meaning as in MOF, or an
 // integer, a real number, TRUE or FALSE. A reference is the text of its path, in quotes like any text. Only the schema
 // knows which texts are references, so the reader returns them as texts. These functions keep no state.
+
+#include <cstddef>
+#include <string>
+#include <string_view>
+
+#include "broker/objects/Value.h"
+#include "util/Expected.h"
 
 namespace zorva::broker {
 

@@ -1,9 +1,9 @@
 #pragma once
 
+// The qualifiers of the schema, as CMPI hands them out by the path of a class.
+
 #include "broker/objects/Objects.h"
 #include "schema/ClassRepository.h"
-
-// The qualifiers of the schema, as CMPI hands them out by the path of a class.
 
 namespace zorva::broker {
 

@@ -6,18 +6,18 @@ namespace zorva::broker {
 
 namespace {
 
-template <class Object>
+template <typename Object>
 CMPIrc refusal(const typename Object::Handle* handle) noexcept {
   return own<Object>(handle) != nullptr ? CMPI_RC_ERR_NOT_SUPPORTED : CMPI_RC_ERR_INVALID_HANDLE;
 }
 
-template <class Object>
+template <typename Object>
 CMPIStatus release(typename Object::Handle* handle) {
   return {own<Object>(handle) != nullptr ? CMPI_RC_OK : CMPI_RC_ERR_INVALID_HANDLE, nullptr};
 }
 
 /// A getter that takes a status last.
-template <class Object, class Result, class... Args>
+template <typename Object, typename Result, typename... Args>
 Result refused(const typename Object::Handle* handle, Args... args) {
   return failed<Result>(detail::lastStatus(args...), refusal<Object>(handle));
 }

@@ -1,11 +1,11 @@
 #pragma once
 
-#include "cmpidt.h"
-#include "cmpift.h"
-
 // Query expressions. This broker runs no queries and delivers no indications, so it never makes such an object. One
 // object of each kind exists, so that its function table can be reached. All their functions answer
 // CMPI_RC_ERR_NOT_SUPPORTED, except that releasing one does nothing.
+
+#include <cmpidt.h>
+#include <cmpift.h>
 
 namespace zorva::broker {
 
@@ -30,7 +30,7 @@ struct PredicateObject : CMPIPredicate {
 };
 
 /// The one object of a kind. It is never changed.
-template <class Object>
+template <typename Object>
 Object& theOnly() noexcept {
   static Object object{{&object, &Object::table}};
   return object;

@@ -1,5 +1,11 @@
 #pragma once
 
+// The memory of one request on one thread: the arena in which its CMPI objects are made, and the memory that its
+// providers allocated. Scopes nest as requests do: an up-call opens one within its caller's. Objects are made in the
+// innermost scope of a thread.
+
+#include <cmpidt.h>
+
 #include <atomic>
 #include <cstddef>
 #include <memory>
@@ -8,11 +14,6 @@
 #include <vector>
 
 #include "broker/objects/Arena.h"
-#include "cmpidt.h"
-
-// The memory of one request on one thread: the arena in which its CMPI objects are made, and the memory that its
-// providers allocated. Scopes nest as requests do: an up-call opens one within its caller's. Objects are made in the
-// innermost scope of a thread.
 
 namespace zorva::broker {
 

@@ -1,5 +1,8 @@
 #pragma once
 
+// Shared by all function tables of the broker. Their functions are called from C: they must not throw. They answer a
+// handle that is null, of the wrong kind or of another broker with CMPI_RC_ERR_INVALID_HANDLE.
+
 #include <cxxabi.h>
 
 #include <memory>
@@ -7,9 +10,6 @@
 #include <type_traits>
 
 #include "broker/objects/Objects.h"
-
-// Shared by all function tables of the broker. Their functions are called from C: they must not throw. They answer a
-// handle that is null, of the wrong kind or of another broker with CMPI_RC_ERR_INVALID_HANDLE.
 
 namespace zorva::broker {
 
@@ -26,7 +26,7 @@ inline void setStatus(CMPIStatus* status, CMPIrc rc, std::string_view message) n
 }
 
 /// Sets the status and returns an empty result: null, 0, or data without a value.
-template <class Result>
+template <typename Result>
 Result failed(CMPIStatus* status, CMPIrc rc, std::string_view message = {}) noexcept {
   setStatus(status, rc, message);
   if constexpr (std::is_same_v<Result, CMPIData>) {
@@ -37,7 +37,7 @@ Result failed(CMPIStatus* status, CMPIrc rc, std::string_view message = {}) noex
 }
 
 /// For functions whose object is null or of the wrong kind.
-template <class Result>
+template <typename Result>
 Result badHandle(CMPIStatus* status) noexcept {
   return failed<Result>(status, CMPI_RC_ERR_INVALID_HANDLE);
 }
@@ -45,7 +45,7 @@ Result badHandle(CMPIStatus* status) noexcept {
 namespace detail {
 
 inline CMPIStatus* lastStatus() noexcept { return nullptr; }
-template <class First, class... Rest>
+template <typename First, typename... Rest>
 CMPIStatus* lastStatus(First first, Rest... rest) noexcept {
   if constexpr (sizeof...(Rest) == 0 && std::is_same_v<First, CMPIStatus*>) {
     return first;
@@ -57,7 +57,7 @@ CMPIStatus* lastStatus(First first, Rest... rest) noexcept {
 template <auto function>
 struct Guarded;
 
-template <class Result, class... Args, Result (*function)(Args...)>
+template <typename Result, typename... Args, Result (*function)(Args...)>
 struct Guarded<function> {
   static Result call(Args... args) {
     try {
@@ -82,7 +82,7 @@ template <auto function>
 inline constexpr auto guarded = &detail::Guarded<function>::call;
 
 /// `release` of every kind: frees an object that clone() made, and does nothing for all others.
-template <class Object>
+template <typename Object>
 CMPIStatus releaseObject(typename Object::Handle* handle) noexcept {
   Object* self = own<Object>(handle);
   if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
@@ -91,7 +91,7 @@ CMPIStatus releaseObject(typename Object::Handle* handle) noexcept {
 }
 
 /// `clone` of every kind: `copy(Arena&, const Object&)` makes the copy in its own arena.
-template <class Object, auto copy>
+template <typename Object, auto copy>
 typename Object::Handle* cloneObject(const typename Object::Handle* handle, CMPIStatus* status) {
   const Object* self = own<Object>(handle);
   if (self == nullptr) return badHandle<typename Object::Handle*>(status);

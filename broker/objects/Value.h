@@ -1,5 +1,9 @@
 #pragma once
 
+// The broker's input and output as plain values: texts in UTF-8, numbers, object paths, instances. They own all that
+// they hold and refer to nothing in a provider or a request. Their only pointers are into the class repository, which
+// outlives them. No locking: a const value may be read by any number of threads.
+
 #include <cstdint>
 #include <memory>
 #include <string>
@@ -10,10 +14,6 @@
 
 #include "schema/ClassRepository.h"
 
-// The broker's input and output as plain values: texts in UTF-8, numbers, object paths, instances. They own all that
-// they hold and refer to nothing in a provider or a request. Their only pointers are into the class repository, which
-// outlives them. No locking: a const value may be read by any number of threads.
-
 namespace zorva::broker {
 
 struct ObjectPath;
@@ -21,7 +21,7 @@ struct Instance;
 
 /// A T on the heap that is copied, compared and moved like the T itself. It lets a value contain its own kind. Never
 /// empty, except after a move; then it may only be assigned to or destroyed.
-template <class T>
+template <typename T>
 class Boxed {
  public:
   Boxed() : value_(std::make_unique<T>()) {}

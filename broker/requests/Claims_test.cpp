@@ -1,4 +1,5 @@
 // The claim that a request holds while its provider works.
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 

@@ -1,10 +1,11 @@
 #include "broker/requests/ControlCharacters.h"
 
+#include <cmpidt.h>
+
 #include <algorithm>
 #include <cstdio>
 #include <string_view>
 
-#include "cmpidt.h"
 #include "util/Names.h"
 #include "util/Utf8.h"
 
@@ -37,7 +38,7 @@ std::optional<std::uint32_t> findIn(const Value& value) {
   return std::nullopt;
 }
 
-template <class Named>
+template <typename Named>
 std::optional<std::uint32_t> findIn(const std::vector<Named>& values) {
   for (const Named& one : values) {
     if (const auto found = findIn(one.value)) return found;

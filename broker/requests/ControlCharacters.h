@@ -1,14 +1,14 @@
 #pragma once
 
+// A text to be stored must not have control characters other than tab (U+0000 to U+001F, U+007F to U+009F): with a line
+// feed in a value, a client could write its own lines into an interface file. Nested values are checked too: elements
+// of arrays, keys of references, embedded instances.
+
 #include <optional>
 #include <string>
 #include <vector>
 
 #include "broker/objects/Value.h"
-
-// A text to be stored must not have control characters other than tab (U+0000 to U+001F, U+007F to U+009F): with a line
-// feed in a value, a client could write its own lines into an interface file. Nested values are checked too: elements
-// of arrays, keys of references, embedded instances.
 
 namespace zorva::broker {
 

@@ -1,9 +1,8 @@
 #include "broker/requests/ControlCharacters.h"
 
+#include <cmpidt.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
-
-#include "cmpidt.h"
 
 namespace zorva::broker {
 namespace {

@@ -1,14 +1,14 @@
 #pragma once
 
+// Works out a modification (DSP0200 5.3.2.8): which properties it changes, and what the provider gets so that all
+// others keep their values.
+
 #include <vector>
 
 #include "broker/core/ProviderRegistry.h"
 #include "broker/objects/Objects.h"
 #include "broker/objects/Value.h"
 #include "broker/requests/ResultFilter.h"
-
-// Works out a modification (DSP0200 5.3.2.8): which properties it changes, and what the provider gets so that all
-// others keep their values.
 
 namespace zorva::broker {
 

@@ -1,4 +1,5 @@
 // What a modification passes to the provider, and what is refused before that.
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 

@@ -1,13 +1,13 @@
 #pragma once
 
+// A client's parameters of an operation, and the types that take its results.
+
 #include <functional>
 #include <optional>
 #include <string>
 #include <vector>
 
 #include "broker/objects/Value.h"
-
-// A client's parameters of an operation, and the types that take its results.
 
 namespace zorva::broker {
 

@@ -138,7 +138,7 @@ const char** Request::providerList(const Shape& shape, const std::vector<const C
   return list;
 }
 
-template <class Function, class... Args>
+template <typename Function, typename... Args>
 Status Request::call(ResultObject& result, const ProviderEntry& entry, std::string_view operation, Function function,
                      Args... args) {
   Status status;
@@ -425,7 +425,7 @@ Status Request::findAssociations(const PathObject& path, const FarEnd& filter, b
   return {};
 }
 
-template <class Ask>
+template <typename Ask>
 Status Request::askEach(const std::vector<Association>& associations, const ResultFilter& results, Ask&& ask) {
   Outcome outcome;
   for (const Association& one : associations) {

@@ -1,5 +1,8 @@
 #pragma once
 
+// One request, of a client or of a provider's up-call: which providers are asked, what they get, and which of their
+// results are passed on. It opens a scope on its thread that ends with it.
+
 #include <memory>
 #include <string_view>
 #include <vector>
@@ -11,9 +14,6 @@
 #include "broker/requests/HeldClaim.h"
 #include "broker/requests/Result.h"
 #include "broker/requests/ResultFilter.h"
-
-// One request, of a client or of a provider's up-call: which providers are asked, what they get, and which of their
-// results are passed on. It opens a scope on its thread that ends with it.
 
 namespace zorva::broker {
 
@@ -43,8 +43,8 @@ class Request {
   /// none.
   Status claim(Access access, std::string_view className, const ObjectPath* changed, std::unique_ptr<HeldClaim>& held);
 
-  // The operations. `path` lives in this request's arena or outlives it. Its namespace may be in any spelling; empty
-  // means the default. Statuses as in Broker.h.
+  /// The operations. `path` lives in this request's arena or outlives it. Its namespace may be in any spelling; empty
+  /// means the default. Statuses as in Broker.h.
   Status enumerate(const PathObject& path, Form form, const Shape& shape, Taker& taker);
   Status get(const PathObject& path, const Shape& shape, Taker& taker);
   Status create(const PathObject& path, const InstanceObject& instance, Taker& taker);
@@ -71,10 +71,10 @@ class Request {
   const char** providerList(const Shape& shape, const std::vector<const ClassInfo*>& classes);
 
   /// Calls a function of a provider's table, null if the provider lacks it. Its exceptions become a failure.
-  template <class Function, class... Args>
+  template <typename Function, typename... Args>
   Status call(ResultObject& result, const ProviderEntry& entry, std::string_view operation, Function function,
               Args... args);
-  template <class Ask>
+  template <typename Ask>
   Status askEach(const std::vector<Association>& associations, const ResultFilter& results, Ask&& ask);
   Status enumerateOne(const PathObject& path, const ClassInfo& info, Form form, const Shape& shape,
                       ResultFilter& filter, bool& unavailable);

@@ -16,7 +16,7 @@ CMPIResult* clone(const CMPIResult* handle, CMPIStatus* status) {
 
 /// Runs `take` under the result's lock, unless the receiver needs no more. An exception of the receiver becomes the
 /// error of the operation; the provider does not see it.
-template <class Take>
+template <typename Take>
 CMPIStatus give(ResultObject& self, Take take) {
   const std::lock_guard lock(self.mutex);
   self.claim.reset();

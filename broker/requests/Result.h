@@ -1,13 +1,13 @@
 #pragma once
 
+// A CMPIResult for a provider's results: it passes each one to a receiver at once.
+
 #include <memory>
 #include <mutex>
 #include <string>
 
 #include "broker/objects/Objects.h"
 #include "broker/requests/HeldClaim.h"
-
-// A CMPIResult for a provider's results: it passes each one to a receiver at once.
 
 namespace zorva::broker {
 
@@ -46,7 +46,7 @@ struct ResultObject : CMPIResult {
   const std::string who;
   Arena* arena = nullptr;  ///< null: release() does nothing
 
-  std::mutex mutex;                  // guards the next members
+  std::mutex mutex;                  ///< guards the next members
   std::unique_ptr<HeldClaim> claim;  ///< dropped with the first result
   bool full = false;                 ///< the receiver needs no more
   CMPIrc errorCode = CMPI_RC_OK;

@@ -1,5 +1,8 @@
 #pragma once
 
+// Filters results between a provider and their receiver: providers return more than was requested, and with incomplete
+// names.
+
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -12,9 +15,6 @@
 #include "broker/objects/Objects.h"
 #include "broker/objects/Scope.h"
 #include "broker/requests/Result.h"
-
-// Filters results between a provider and their receiver: providers return more than was requested, and with incomplete
-// names.
 
 namespace zorva::broker {
 

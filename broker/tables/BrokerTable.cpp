@@ -1,3 +1,9 @@
+// CMPIBrokerFT: properties of the broker, threads, and the up-calls of providers. An up-call is a request of its own,
+// nested in that of its caller; its results are copied into the caller's scope.
+//
+// The invocation flags in the context belong to the client's own request and are not applied to up-calls: a client that
+// asks for local properties only must not remove keys that the provider needs.
+
 #include <string>
 #include <utility>
 
@@ -5,12 +11,6 @@
 #include "broker/objects/Data.h"
 #include "broker/objects/TableSupport.h"
 #include "broker/requests/Request.h"
-
-// CMPIBrokerFT: properties of the broker, threads, and the up-calls of providers. An up-call is a request of its own,
-// nested in that of its caller; its results are copied into the caller's scope.
-//
-// The invocation flags in the context belong to the client's own request and are not applied to up-calls: a client that
-// asks for local properties only must not remove keys that the provider needs.
 
 namespace zorva::broker {
 
@@ -110,7 +110,7 @@ Shape shapeOf(const char** properties) {
 std::string_view orEmpty(const char* text) noexcept { return text != nullptr ? text : std::string_view(); }
 
 /// Runs `ask(Request&, const PathObject&, Taker&)` and returns what it collected; null on a failure.
-template <class Ask>
+template <typename Ask>
 CMPIEnumeration* collected(const CMPIBroker* broker, const CMPIContext* context, const CMPIObjectPath* path,
                            CMPIType type, CMPIStatus* status, Ask&& ask) {
   Status result;

@@ -1,3 +1,6 @@
+// CMPIBrokerEncFT: makes objects in the innermost scope of the thread, names them, shows them as text, and handles
+// messages and the log.
+
 #include <chrono>
 #include <cstdarg>
 #include <string>
@@ -10,9 +13,6 @@
 #include "broker/objects/Objects.h"
 #include "broker/objects/Scope.h"
 #include "broker/objects/TableSupport.h"
-
-// CMPIBrokerEncFT: makes objects in the innermost scope of the thread, names them, shows them as text, and handles
-// messages and the log.
 
 namespace zorva::broker {
 

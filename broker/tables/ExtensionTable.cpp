@@ -1,3 +1,5 @@
+// CMPIBrokerExtFT: threads, mutexes and conditions, on pthreads. Integer results are 0 or an errno value.
+
 #include <pthread.h>
 
 #include <cerrno>
@@ -9,8 +11,6 @@
 
 #include "broker/core/BrokerCore.h"
 #include "broker/objects/TableSupport.h"
-
-// CMPIBrokerExtFT: threads, mutexes and conditions, on pthreads. Integer results are 0 or an errno value.
 
 namespace zorva::broker {
 
@@ -30,7 +30,7 @@ struct Condition {
   pthread_cond_t condition{};
 };
 
-template <class T>
+template <typename T>
 T* checked(void* handle, std::uint64_t tag) noexcept {
   if (handle == nullptr) return nullptr;
   std::uint64_t found = 0;

@@ -1,10 +1,10 @@
+// CMPIBrokerMemFT: memory that is freed with the request.
+
 #include <cstring>
 
 #include "broker/core/BrokerCore.h"
 #include "broker/objects/Scope.h"
 #include "broker/objects/TableSupport.h"
-
-// CMPIBrokerMemFT: memory that is freed with the request.
 
 namespace zorva::broker {
 
@@ -58,7 +58,7 @@ void cmpiFree(const CMPIBroker* broker, void* block) {
 }
 
 /// freeInstance and its siblings: the object's own release.
-template <class Object>
+template <typename Object>
 void freeObject(const CMPIBroker* broker, typename Object::Handle* object) {
   if (BrokerCore::of(broker) == nullptr) return;
   if (isForeign(object)) {

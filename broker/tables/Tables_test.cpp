@@ -1,3 +1,7 @@
+// Every slot of every table is called: once with good arguments, then with each pointer null in turn, then with each
+// object replaced by one of another kind in turn. The list of slots comes from the facts about CMPI
+// (generate_slot_test.py).
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
@@ -17,10 +21,6 @@
 #include "broker/objects/Scope.h"
 #include "broker/requests/Result.h"
 #include "broker/testing/TestClasses.h"
-
-// Every slot of every table is called: once with good arguments, then with each pointer null in turn, then with each
-// object replaced by one of another kind in turn. The list of slots comes from the facts about CMPI
-// (generate_slot_test.py).
 
 namespace zorva::broker {
 namespace {
@@ -122,7 +122,7 @@ const char* goodText(const std::string& slot, const std::string& parameter) {
 }
 
 /// The good argument of each type.
-template <class T>
+template <typename T>
 T good(World& world, const std::string& slot, const std::string& parameter) {
   using Bare = std::remove_const_t<std::remove_pointer_t<T>>;
   if constexpr (std::is_same_v<Bare, CMPIBroker>)
@@ -192,25 +192,25 @@ T good(World& world, const std::string& slot, const std::string& parameter) {
     return T{};
 }
 
-template <class... Args, std::size_t... index>
+template <typename... Args, std::size_t... index>
 std::tuple<Args...> goodArguments(World& world, const std::string& slot,
                                   const std::array<std::string, sizeof...(Args)>& names,
                                   std::index_sequence<index...> /*all*/) {
   return {good<Args>(world, slot, names[index])...};
 }
 
-template <class T, class... Kinds>
+template <typename T, typename... Kinds>
 constexpr bool isOneOf() {
   return (std::is_same_v<T, Kinds> || ...);
 }
 
-template <class T>
+template <typename T>
 inline constexpr bool isHandle = isOneOf<std::remove_const_t<T>, CMPIBroker, CMPIString, CMPIObjectPath, CMPIInstance,
                                          CMPIArray, CMPIArgs, CMPIDateTime, CMPIError, CMPIContext, CMPIEnumeration,
                                          CMPIResult, CMPISelectExp, CMPISelectCond, CMPISubCond, CMPIPredicate>();
 
 /// An object of another kind than T*.
-template <class T>
+template <typename T>
 T* wrongKind(World& world) {
   void* other = std::is_same_v<std::remove_const_t<T>, CMPIString> ? static_cast<void*>(world.path)
                                                                    : static_cast<void*>(world.string);
@@ -229,7 +229,7 @@ struct Told {
   CMPIrc rc = CMPI_RC_OK;
 };
 
-template <class R, class... Args>
+template <typename R, typename... Args>
 Told callWith(World& world, R (*function)(Args...), std::tuple<Args...>& arguments) {
   constexpr bool hasStatus = (std::is_same_v<Args, CMPIStatus*> || ...);
   if constexpr (std::is_same_v<R, CMPIStatus>) {
@@ -251,7 +251,7 @@ bool isOptional(const std::string& slot, const std::string& parameter) {
   return parameter == "string" && (slot == "CMPIBrokerEncFT.logMessage" || slot == "CMPIBrokerEncFT.trace");
 }
 
-template <std::size_t index, class R, class... Args>
+template <std::size_t index, typename R, typename... Args>
 void exerciseOne(const std::string& slot, R (*function)(Args...), const std::array<std::string, sizeof...(Args)>& names,
                  Variant variant) {
   using T = std::tuple_element_t<index, std::tuple<Args...>>;
@@ -276,7 +276,7 @@ void exerciseOne(const std::string& slot, R (*function)(Args...), const std::arr
   }
 }
 
-template <class R, class... Args>
+template <typename R, typename... Args>
 void exercise(const std::string& slot, R (*function)(Args...), std::array<std::string, sizeof...(Args)> names) {
   ASSERT_NE(function, nullptr) << slot;
   {

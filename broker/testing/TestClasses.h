@@ -1,12 +1,12 @@
 #pragma once
 
+// The classes that TestProvider.cpp serves, for the tests of the broker.
+
 #include <memory>
 #include <stdexcept>
 
 #include "schema/ClassRepository.h"
 #include "schema/Mof.h"
-
-// The classes that TestProvider.cpp serves, for the tests of the broker.
 
 namespace zorva::broker::testing {
 

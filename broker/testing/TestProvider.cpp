@@ -1,15 +1,15 @@
+// A provider library for the tests of the broker: it serves the classes of TestClasses.h, correctly or with the errors
+// that a test asks for, and writes its arguments to the broker's log.
+
+#include <cmpidt.h>
+#include <cmpift.h>
+#include <cmpimacs.h>
+
 #include <atomic>
 #include <mutex>
 #include <stdexcept>
 #include <string>
 #include <vector>
-
-#include "cmpidt.h"
-#include "cmpift.h"
-#include "cmpimacs.h"
-
-// A provider library for the tests of the broker: it serves the classes of TestClasses.h, correctly or with the errors
-// that a test asks for, and writes its arguments to the broker's log.
 
 namespace {
 

@@ -1,5 +1,7 @@
 #pragma once
 
+// For tests: requests in two lines, and their responses.
+
 #include <mutex>
 #include <optional>
 #include <string>
@@ -7,8 +9,6 @@
 #include <vector>
 
 #include "cimom/Service.h"
-
-// For tests: requests in two lines, and their responses.
 
 namespace zorva::cimom::testing {
 

@@ -1,5 +1,6 @@
-// The headers that most sources of the products include; precompiled in builds with tests.
 #pragma once
+
+// The headers that most sources of the products include; precompiled in builds with tests.
 
 #include <algorithm>
 #include <array>

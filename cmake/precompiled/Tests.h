@@ -1,6 +1,7 @@
+#pragma once
+
 // The headers that most tests include, precompiled. Templates that each test would instantiate again are instantiated
 // once, in Tests.cpp.
-#pragma once
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

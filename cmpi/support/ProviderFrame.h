@@ -1,5 +1,6 @@
-// What providers share: function tables and create functions.
 #pragma once
+
+// What providers share: function tables and create functions.
 
 #include <cmpidt.h>
 #include <cmpift.h>
@@ -8,12 +9,12 @@
 
 namespace zorva::cmpi {
 
-// The version of the function tables, as all CMPI 2.x servers take it.
+/// The version of the function tables, as all CMPI 2.x servers take it.
 constexpr CMPISint32 kTableVersion = 200;
 
 constexpr CMPIStatus kNotSupported = {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
 
-// A function table of these members. Later versions of CMPI have appended slots to the tables; they stay null.
+/// A function table of these members. Later versions of CMPI have appended slots to the tables; they stay null.
 template <typename Table, typename... Members>
 constexpr Table tableOf(Members... members) {
   if constexpr (requires { Table{members..., nullptr}; }) {
@@ -25,8 +26,8 @@ constexpr Table tableOf(Members... members) {
 
 }  // namespace zorva::cmpi
 
-// The create function of a provider's Instance, Association or Method operations. It hands out this table, and puts the
-// broker into that variable: the latest call wins.
+/// The create function of a provider's Instance, Association or Method operations. It hands out this table, and puts
+/// the broker into that variable: the latest call wins.
 #define ZORVA_CREATE_MI(kind, prefix, table, brokerVariable)                                                     \
   ZORVA_PROVIDER_EXPORT CMPI##kind##MI* prefix##_Create_##kind##MI(const CMPIBroker* broker, const CMPIContext*, \
                                                                    CMPIStatus*) {                                \

@@ -1,5 +1,7 @@
 #pragma once
 
+// For tests: a client that sends any bytes, valid HTTP or not.
+
 #include <chrono>
 #include <map>
 #include <optional>
@@ -8,8 +10,6 @@
 
 #include "http/Listener.h"
 #include "util/FileDescriptor.h"
-
-// For tests: a client that sends any bytes, valid HTTP or not.
 
 namespace zorva::http::testing {
 

@@ -1,4 +1,3 @@
-// Shared by the tests of ModifyInstance of the three classes.
 #pragma once
 
 #include <unistd.h>
@@ -14,7 +13,7 @@ inline void expectDoneWithoutExit(const Outcome& outcome) {
   EXPECT_FALSE(outcome.markedExit());
 }
 
-// Ends a test that waits; the providers never do.
+/// Ends a test that waits; the providers never do.
 class Deadline {
  public:
   Deadline() { ::alarm(20); }

@@ -1,5 +1,7 @@
 #pragma once
 
+// For tests: zorvacimd itself, on a host that is a tree in a file.
+
 #include <sys/types.h>
 
 #include <chrono>
@@ -11,8 +13,6 @@
 #include "agent/testing/TemporaryDirectory.h"
 #include "http/Listener.h"
 #include "util/FileDescriptor.h"
-
-// For tests: zorvacimd itself, on a host that is a tree in a file.
 
 namespace zorva::server::testing {
 

@@ -5,12 +5,12 @@
 #include <utility>
 #include <vector>
 
-#include "World.h"
 #include "agent/Seams.h"
+#include "tests/support/World.h"
 
 namespace ZV::Test {
 
-// The contents of a file at each log line.
+/// The contents of a file at each log line.
 class FileAtEachLine : private zorva::agent::LogSink {
  public:
   FileAtEachLine(const World& world, std::string interface) : world_(world), interface_(std::move(interface)) {

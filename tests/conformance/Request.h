@@ -1,5 +1,6 @@
-// The request of a case.
 #pragma once
+
+// The request of a case.
 
 #include <cmpift.h>
 
@@ -8,10 +9,10 @@
 #include <vector>
 
 #include "CaseFile.h"
-#include "CimValues.h"
-#include "ProviderCall.h"
 #include "Providers.h"
-#include "RecordingBroker.h"
+#include "tests/support/CimValues.h"
+#include "tests/support/ProviderCall.h"
+#include "tests/support/RecordingBroker.h"
 
 namespace ZV::Test {
 
@@ -42,22 +43,22 @@ struct Request {
   std::optional<std::string> role;
   std::optional<std::string> resultRole;
   std::string method;
-  std::vector<NamedValue> values;  // of the instance or of the method's arguments
+  std::vector<NamedValue> values;  ///< of the instance or of the method's arguments
   bool withoutInstance = false;
-  bool withoutHandle = false;  // of the instance
+  bool withoutHandle = false;  ///< of the instance
 };
 
-// The request in a case's lines; the default association is the provider's own. Throws CaseError.
+/// The request in a case's lines; the default association is the provider's own. Throws CaseError.
 Request readRequest(const std::vector<WrittenLine>& lines, const std::string& ownAssociation);
 
-// The objects with which a provider is called; made before the call is recorded.
+/// The objects with which a provider is called; made before the call is recorded.
 struct RequestObjects {
   RequestObjects(RecordingBroker& broker, const Request& request);
 
   const CMPIContext* context;
   CMPIResult* result;
   CMPIObjectPath* ref;
-  CMPIInstance* instance;  // null if the request has none
+  CMPIInstance* instance;  ///< null if the request has none
   CMPIArgs* in;
   CMPIArgs* out;
 };

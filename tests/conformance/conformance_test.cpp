@@ -1,6 +1,7 @@
 // Makes a test of every case in the files of this folder, and for each file tests of all its cases over brokers that
 // return wrong states. With ZORVA_CONFORMANCE_RECORD set in the environment a test also prints the result of its
 // request, in the notation of a case.
+
 #include <gtest/gtest.h>
 
 #include <cstdlib>

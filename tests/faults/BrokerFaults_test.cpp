@@ -1,4 +1,5 @@
 // The broker fails at each call of a request, in each possible way.
+
 #include "FaultTest.h"
 
 namespace ZV::Test {

@@ -1,4 +1,5 @@
 // Each call on a file fails: on the interfaces' files, and on those of the values that are set through the agent.
+
 #include <algorithm>
 #include <array>
 #include <sstream>

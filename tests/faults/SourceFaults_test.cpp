@@ -1,5 +1,6 @@
 // Each call with which the agent reads a host fails: a live host, or a document. What could not be read for a temporary
 // reason is there at the next look.
+
 #include <gmock/gmock.h>
 
 #include <algorithm>

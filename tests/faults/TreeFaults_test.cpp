@@ -1,9 +1,10 @@
 // The instrumentation throws at each call of a request: a std::exception, or something else.
+
 #include <string_view>
 
 #include "FaultTest.h"
-#include "Places.h"
 #include "agent/Seams.h"
+#include "tests/support/Places.h"
 
 namespace ZV::Test {
 namespace {

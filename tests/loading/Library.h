@@ -1,15 +1,16 @@
-// The provider library as a server loads it, and a host that the agent of a loaded library reads.
 #pragma once
+
+// The provider library as a server loads it, and a host that the agent of a loaded library reads.
 
 #include <string>
 #include <vector>
 
-#include "ProviderCall.h"
 #include "agent/testing/TemporaryDirectory.h"
+#include "tests/support/ProviderCall.h"
 
 namespace ZV::Test {
 
-// A shared library, loaded by the constructor and unloaded by the destructor. mode is RTLD_LOCAL or RTLD_GLOBAL.
+/// A shared library, loaded by the constructor and unloaded by the destructor. mode is RTLD_LOCAL or RTLD_GLOBAL.
 class Library {
  public:
   explicit Library(const std::string& path, int mode);
@@ -17,7 +18,7 @@ class Library {
   Library(const Library&) = delete;
   Library& operator=(const Library&) = delete;
 
-  // The library's own function of that name; throws std::runtime_error if it has none.
+  /// The library's own function of that name; throws std::runtime_error if it has none.
   template <typename Function>
   Function find(const std::string& name) const {
     return reinterpret_cast<Function>(address(name));
@@ -31,7 +32,7 @@ class Library {
 
 std::string providerLibraryPath();
 
-// One of the twelve providers, by the names that a server knows.
+/// One of the twelve providers, by the names that a server knows.
 struct ProviderNames {
   const char* prefix;
   const char* className;
@@ -39,7 +40,7 @@ struct ProviderNames {
 };
 const std::vector<ProviderNames>& allProviderNames();
 
-// A host of two interfaces in a document, which the agent reads as long as this object lives.
+/// A host of two interfaces in a document, which the agent reads as long as this object lives.
 class DocumentHost {
  public:
   DocumentHost();
@@ -51,10 +52,10 @@ class DocumentHost {
   zorva::agent::testing::TemporaryDirectory directory_;
 };
 
-// The objects of that host that other providers serve.
+/// The objects of that host that other providers serve.
 void serveOthers(RecordingBroker& broker);
 
-// Requests everything from each of the twelve, and reports how each request ended and its results.
+/// Requests everything from each of the twelve, and reports how each request ended and its results.
 std::string askEverything(const Library& library, RecordingBroker& broker);
 
 }  // namespace ZV::Test

@@ -1,5 +1,6 @@
 // The library in a foreign process: together with another that has all its names, loaded and unloaded repeatedly, used
 // by two brokers, and with an agent that cannot work.
+
 #include <dlfcn.h>
 #include <fcntl.h>
 #include <gmock/gmock.h>

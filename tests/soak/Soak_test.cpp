@@ -2,6 +2,7 @@
 // libraries, while the host changes: interfaces come and go, files are rewritten and replaced.
 //
 // ZORVA_SOAK_SECONDS sets the duration; the default is one second.
+
 #include <gmock/gmock.h>
 #include <sys/wait.h>
 #include <unistd.h>

@@ -1,4 +1,4 @@
-#include "BrokerObjects.h"
+#include "tests/support/BrokerObjects.h"
 
 #include <array>
 

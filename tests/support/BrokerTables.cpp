@@ -1,8 +1,9 @@
 // The function tables of the recording broker's objects: each function records its call, checks whether it must fail,
 // and does its work.
+
 #include <cstring>
 
-#include "BrokerObjects.h"
+#include "tests/support/BrokerObjects.h"
 
 namespace ZV::Test {
 

@@ -1,4 +1,4 @@
-#include "CimValues.h"
+#include "tests/support/CimValues.h"
 
 #include <strings.h>
 

@@ -1,5 +1,6 @@
-// The order of everything that is recorded: calls to a broker and log lines form one sequence.
 #pragma once
+
+// The order of everything that is recorded: calls to a broker and log lines form one sequence.
 
 #include <atomic>
 #include <cstddef>

@@ -1,4 +1,4 @@
-#include "ProviderCall.h"
+#include "tests/support/ProviderCall.h"
 
 #include <functional>
 #include <utility>

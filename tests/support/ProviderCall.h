@@ -1,5 +1,6 @@
-// Calls a provider through its function tables, as a CIM server would, and returns all results.
 #pragma once
+
+// Calls a provider through its function tables, as a CIM server would, and returns all results.
 
 #include <cmpift.h>
 
@@ -10,46 +11,46 @@
 #include <string>
 #include <vector>
 
-#include "CimValues.h"
-#include "RecordingBroker.h"
-#include "RecordingLogger.h"
+#include "tests/support/CimValues.h"
+#include "tests/support/RecordingBroker.h"
+#include "tests/support/RecordingLogger.h"
 
 namespace ZV::Test {
 
-// The results of one operation.
+/// The results of one operation.
 struct Outcome {
   CMPIrc rc = CMPI_RC_OK;
-  std::optional<std::string> message;  // of the status
+  std::optional<std::string> message;  ///< of the status
   Results result;
-  std::vector<NamedValue> out;  // output arguments of a method
-  Calls calls;                  // the provider's calls to the broker and its objects
-  LogLines lines;               // the log pairs, one line each, if a RecordingLogger was active
+  std::vector<NamedValue> out;  ///< output arguments of a method
+  Calls calls;                  ///< the provider's calls to the broker and its objects
+  LogLines lines;               ///< the log pairs, one line each, if a RecordingLogger was active
 
   const std::vector<Instance>& instances() const { return result.instances; }
   const std::vector<Path>& paths() const { return result.paths; }
   bool done() const { return result.done(); }
   std::vector<std::string> errors() const { return lines.errors(); }
 
-  // Whether the operation's entry and exit marks are there: the last line of the entry, the first of the exit.
+  /// Whether the operation's entry and exit marks are there: the last line of the entry, the first of the exit.
   bool markedEntry() const;
   bool markedExit() const;
 
-  // The calls that make, change or return something, and the log lines, in the order in which they happened; a log line
-  // as `log 6000 MESSAGE No ObjectPath Found`.
+  /// The calls that make, change or return something, and the log lines, in the order in which they happened; a log
+  /// line as `log 6000 MESSAGE No ObjectPath Found`.
   std::vector<std::string> story() const;
 };
 
 std::ostream& operator<<(std::ostream& out, const Outcome& outcome);
 const char* nameOf(CMPIrc rc);
 
-// A property list: null, which requests everything, or names; {} is a list of no names.
+/// A property list: null, which requests everything, or names; {} is a list of no names.
 class PropertyList {
  public:
   PropertyList(std::nullptr_t) {}
   PropertyList(std::initializer_list<std::string> names) : names_(names) {}
   explicit PropertyList(std::vector<std::string> names) : names_(std::move(names)) {}
 
-  // The list in CMPI's form, valid as long as this is.
+  /// The list in CMPI's form, valid as long as this is.
   const char** cmpi();
 
  private:
@@ -57,7 +58,7 @@ class PropertyList {
   std::vector<const char*> pointers_;
 };
 
-// The arguments of an association operation besides the path; null if left out.
+/// The arguments of an association operation besides the path; null if left out.
 struct AssociationQuery {
   const char* assocClass = nullptr;
   const char* resultClass = nullptr;
@@ -99,7 +100,7 @@ class AssociationProvider {
   Outcome cleanup(bool terminating = true);
   Outcome associators(const Path& path, AssociationQuery query);
   Outcome associatorNames(const Path& path, const AssociationQuery& query);
-  Outcome references(const Path& path, AssociationQuery query = {});  // of the query: resultClass, role, properties
+  Outcome references(const Path& path, AssociationQuery query = {});  ///< of the query: resultClass, role, properties
   Outcome referenceNames(const Path& path, const AssociationQuery& query = {});
 
  private:

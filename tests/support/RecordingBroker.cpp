@@ -1,12 +1,12 @@
-#include "RecordingBroker.h"
+#include "tests/support/RecordingBroker.h"
 
 #include <algorithm>
 #include <array>
 #include <cstdlib>
 #include <cstring>
 
-#include "BrokerObjects.h"
-#include "Places.h"
+#include "tests/support/BrokerObjects.h"
+#include "tests/support/Places.h"
 
 namespace ZV::Test {
 

@@ -1,4 +1,4 @@
-#include "RecordingBroker.h"
+#include "tests/support/RecordingBroker.h"
 
 #include <cmpimacs.h>
 

@@ -1,11 +1,11 @@
-#include "RecordingLogger.h"
+#include "tests/support/RecordingLogger.h"
 
 #include <algorithm>
 #include <atomic>
 #include <cstdlib>
 #include <utility>
 
-#include "Places.h"
+#include "tests/support/Places.h"
 
 namespace ZV::Test {
 

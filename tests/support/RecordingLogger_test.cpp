@@ -1,4 +1,4 @@
-#include "RecordingLogger.h"
+#include "tests/support/RecordingLogger.h"
 
 #include "Matchers.h"
 #include "agent/interface/ZALogger.h"

@@ -1,4 +1,4 @@
-#include "World.h"
+#include "tests/support/World.h"
 
 #include <cstdlib>
 #include <filesystem>
@@ -7,8 +7,8 @@
 #include <stdexcept>
 #include <utility>
 
-#include "RecordingLogger.h"
 #include "agent/Agent.h"
+#include "tests/support/RecordingLogger.h"
 
 namespace ZV::Test {
 

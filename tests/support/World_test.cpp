@@ -1,4 +1,4 @@
-#include "World.h"
+#include "tests/support/World.h"
 
 #include <filesystem>
 
@@ -7,6 +7,7 @@
 #include "agent/interface/Instrumentation.h"
 #include "agent/interface/PlatformUtilities.h"
 #include "agent/interface/ZALogger.h"
+#include "tests/support/RecordingLogger.h"
 
 namespace ZV::Test {
 namespace {

@@ -1,6 +1,7 @@
+#pragma once
+
 // The agent's headers as another vendor may have them: the same names, no member const, and a cursor that converts to
 // bool by itself. They are for compiling the library and have no implementation.
-#pragma once
 
 namespace ZV {
 namespace NodeLexicon {
