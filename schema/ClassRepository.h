@@ -63,7 +63,7 @@ class Class {
   /// The reference properties, in the order of properties(). Empty if the class is no association.
   const std::vector<const ClassProperty*>& references() const noexcept { return references_; }
 
-  /// Null where the class has no such property or method.
+  /// Null if the class has no such property or method.
   const ClassProperty* findProperty(std::string_view name) const noexcept;
   const ClassMethod* findMethod(std::string_view name) const noexcept;
 

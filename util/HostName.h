@@ -6,8 +6,8 @@
 
 namespace zorva::util {
 
-/// What uname(2) says, in the UTS namespace of the calling thread; the empty text where it says nothing. No resolver is
-/// asked.
+/// The node name of uname(2), in the UTS namespace of the calling thread; the empty text if there is none. No resolver
+/// is asked.
 std::string kernelHostName();
 
 }  // namespace zorva::util

@@ -1,7 +1,6 @@
 #pragma once
 
-// Reads configurations in TOML 1.0. What a person has written is checked to the last key, and an error says where it
-// is.
+// Reads configurations in TOML 1.0. Every key is checked, and an error names its place.
 
 #include <climits>
 #include <cstdint>
@@ -22,7 +21,7 @@ class TomlError : public std::runtime_error {
       : std::runtime_error(problem), line_(line), key_(std::move(key)) {}
 
   int line() const { return line_; }               ///< from 1; 0 is unknown
-  const std::string& key() const { return key_; }  ///< "table.key"; empty where no key is to blame
+  const std::string& key() const { return key_; }  ///< "table.key"; empty if the error is not about a key
 
  private:
   int line_;
@@ -46,8 +45,8 @@ class TomlDocument {
   std::unique_ptr<Parsed> parsed_;
 };
 
-/// One table of a document, which must outlive it. A function that takes a value leaves the variable as it is where the
-/// table, or the key in it, is not there. All throw TomlError.
+/// One table of a document, which must outlive it. A function that takes a value leaves the variable unchanged if the
+/// table, or the key in it, does not exist. All throw TomlError.
 class TomlTable {
  public:
   TomlTable(const TomlDocument& document, std::string name);
@@ -76,7 +75,7 @@ class TomlTable {
 
   const std::string name_;
   struct Table;
-  std::unique_ptr<Table> table_;  ///< null where the document has none of that name
+  std::unique_ptr<Table> table_;  ///< null if the document has none of that name
   std::vector<std::string_view> known_;
 };
 

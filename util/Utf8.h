@@ -9,8 +9,8 @@
 
 namespace zorva::util {
 
-/// The number of bytes of the well-formed character at the begin of the text; 0 where there is none. Overlong forms,
-/// surrogates and what is past U+10FFFF are not well-formed.
+/// The number of bytes of the well-formed character at the beginning of the text; 0 if there is none. Overlong forms,
+/// surrogates and characters above U+10FFFF are not well-formed.
 std::size_t utf8Length(std::string_view text) noexcept;
 
 /// The character at the begin of the text, which must be well-formed and not empty.

@@ -59,8 +59,8 @@ struct Config {
 /// read included. Thread-safe.
 ZORVA_AGENT_API Config readConfig(const std::string& path);
 
-/// The configuration of this process as its environment asks for it: the file that ZORVAGENT_CONFIG names, else
-/// /etc/zorvagent/agent.toml, else, where that is not there, the built-in defaults. Throws as readConfig does.
+/// The configuration that the environment selects: the file that ZORVAGENT_CONFIG names, else
+/// /etc/zorvagent/agent.toml, else, if that does not exist, the built-in defaults. Throws as readConfig does.
 ZORVA_AGENT_API Config readDefaultConfig();
 
 }  // namespace zorva::agent

@@ -44,7 +44,7 @@ class CurrentConfig {
   const Loaded& loaded();
 
   std::mutex mutex_;
-  std::deque<Loaded> configs_;  ///< the last one holds; earlier ones stay for those who point at them
+  std::deque<Loaded> configs_;  ///< the last one is current; earlier ones stay because callers point at them
   std::atomic<const Loaded*> loaded_ = nullptr;
 };
 

@@ -129,7 +129,7 @@ constinit std::mutex outputMutex;
 
 class Output {
  public:
-  // What is registered first is locked last over a fork: a line takes the log's lock, then the configuration's.
+  // The handler that is registered first locks last at a fork: a line takes the log's lock, then the configuration's.
   Output() {
     CurrentConfig::instance();
     const auto unlock = [] { outputMutex.unlock(); };

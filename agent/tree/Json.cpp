@@ -16,7 +16,7 @@ constexpr char32_t kByteBase = 0x10EE00;
 
 bool isByte(char32_t character) { return character >= kByteBase + 0x80 && character <= kByteBase + 0xFF; }
 
-// A byte that is no UTF-8 becomes a character of its own, and so do the bytes of such a character.
+// A byte that is not UTF-8 becomes a character of a private plane, and so do the bytes of such a character.
 std::string bytesToJson(std::string_view bytes) {
   std::string text;
   text.reserve(bytes.size());
@@ -197,7 +197,7 @@ void startLine(std::string& text, std::size_t depth) {
 
 std::string quoted(const std::string& bytes) { return nlohmann::json(bytesToJson(bytes)).dump(); }
 
-// The elements of a list or the members of an object, each on a line of its own.
+// The elements of a list or the members of an object, each on its own line.
 void formatItems(std::string& text, const JsonValue& value, std::size_t depth) {
   for (std::size_t i = 0; i < value.items.size(); ++i) {
     if (i != 0) text += ',';

@@ -1,7 +1,7 @@
 #include "cli/commands/CommandLine.h"
 
-// The only source that sees CLI11, whose headers take long to compile. Its templates are left alone for the same
-// reason: options are read by callbacks.
+// The only source that includes CLI11, because its headers take long to compile. Its templates are not used for the
+// same reason: options are read by callbacks.
 #include <CLI/CLI.hpp>
 #include <algorithm>
 #include <charconv>
@@ -34,7 +34,7 @@ struct CommandLine::Registered {
   Command command;
   std::map<const CLI::App*, std::string> examples;
   std::map<const CLI::App*, std::vector<OutputFormat>> formats;
-  std::map<const CLI::Option*, std::string> kinds;  ///< where the name of the option does not say it
+  std::map<const CLI::Option*, std::string> kinds;  ///< if the name of the option does not say it
   std::map<const CLI::Option*, std::vector<std::string>> choices;
 
   /// The formats that a subcommand, or one under it, can write.

@@ -20,10 +20,10 @@ class Option;
 
 namespace zorva::cli {
 
-/// Does what a subcommand is for, and writes to standard output. Throws Failure where it cannot.
+/// Executes a subcommand and writes to standard output. Throws Failure if it fails.
 using Command = std::function<void(const Globals& globals)>;
 
-/// What is to be told instead of running a command: help, the version, or why the command line is wrong.
+/// The text to print instead of running a command: help, the version, or the error of the command line.
 struct Telling {
   std::string text;
   bool isError = false;
@@ -33,12 +33,12 @@ struct Telling {
 /// The possible words at a place of the command line.
 struct Completion {
   std::vector<std::string> words;  ///< subcommands, options, or the values of an option
-  /// What else can: "CLASS", "PATH", "INTERFACE", "METHOD", "PROPERTY", "ROLE", and with a "=" after them "PROPERTY="
-  /// and "PARAMETER="; of others there is no list.
+  /// Other possible words: "CLASS", "PATH", "INTERFACE", "METHOD", "PROPERTY", "ROLE", and with a "=" after them
+  /// "PROPERTY=" and "PARAMETER="; there is no list of others.
   std::string kind;
 };
 
-/// How many words may stand at the last place: any number; at least one; one.
+/// How many words may be given at the last place: any number; at least one; one.
 enum class Many { Any, Some, One };
 
 class CommandLine;
@@ -60,7 +60,7 @@ class Subcommand {
   /// The formats that its help and completion list; without this, and for one format, help lists none.
   Subcommand& writes(std::vector<OutputFormat> formats);
 
-  /// A word at a place of its own, which must be there: "PATH". Its name says what completes it.
+  /// A required positional word: "PATH". Its name says how it is completed.
   Subcommand& word(const std::string& name, const std::string& description, std::string& into);
   Subcommand& optionalWord(const std::string& name, const std::string& description, std::string& into);
 
@@ -81,10 +81,10 @@ class Subcommand {
 
   Subcommand& flag(const std::string& name, const std::string& description, bool& into);
 
-  /// What is done where this subcommand is called.
+  /// The command of this subcommand.
   Subcommand& runs(Command command);
 
-  /// The same with the options of its own, which the command line keeps alive.
+  /// The same with the subcommand's own options, which the command line keeps alive.
   template <typename Options>
   Subcommand& runs(void (*command)(const Globals&, const Options&), std::shared_ptr<const Options> options) {
     return runs([command, options = std::move(options)](const Globals& globals) { command(globals, *options); });
@@ -116,7 +116,7 @@ class CommandLine {
   /// Runs the command that was read. Throws what that throws.
   void run() const;
 
-  /// What can stand after these words.
+  /// The possible words after these words.
   Completion completionAfter(const std::vector<std::string>& words) const;
 
  private:

@@ -61,7 +61,7 @@ TEST(CommandLine, KnowsTheShortNamesOfItsSubcommands) {
   EXPECT_FALSE(tellingOf({"cm", "P", "M"}).isError);
 }
 
-/// What a subcommand of a test has read.
+/// The values that a test's subcommand has read.
 struct Seen {
   std::string path;
   std::string role;
@@ -83,7 +83,7 @@ void addTestCommand(CommandLine& line) {
       .runs([](const Globals& /*globals*/) { ++seen.runs; });
 }
 
-/// What is read where these words follow "try".
+/// The values that are read if these words follow "try".
 Seen seenOf(std::vector<const char*> words) {
   seen = Seen();
   words.insert(words.begin(), "try");
@@ -193,7 +193,7 @@ TEST(CommandLine, TakesAServerOrWhatConcernsThisHost) {
   EXPECT_TRUE(tellingOf({"show", "--url", "http://h", "--config", "f"}).isError);
 }
 
-/// What can stand after these words: subcommands, or else options.
+/// The possible words after these words: subcommands, or else options.
 std::vector<std::string> subcommandsAfter(const std::vector<std::string>& words) {
   std::vector<std::string> found = completionAfter(words).words;
   std::erase_if(found, [](const std::string& word) { return word.starts_with("-") || word == "bash"; });

@@ -26,7 +26,7 @@ namespace zorva::cli {
 namespace {
 
 struct GraphOptions {
-  std::string path;  ///< of the object where it begins; empty: all
+  std::string path;  ///< of the first object; empty: all
   bool all = false;  ///< whatever time it takes
 };
 

@@ -1,6 +1,6 @@
 #pragma once
 
-// What dns, domain and suffixes share: settings read, changed and written, and lists among them.
+// Shared by dns, domain and suffixes: settings, and lists among them, are read, changed and written.
 
 #include <string>
 #include <string_view>
@@ -14,9 +14,9 @@
 
 namespace zorva::cli {
 
-/// What such a command was given.
+/// The arguments of such a command.
 struct SettingOptions {
-  std::string interface;            ///< not where the settings of the host are meant
+  std::string interface;            ///< not for the settings of the host
   std::vector<std::string> values;  ///< servers, suffixes, the name of a domain
   bool dryRun = false;
 };
@@ -37,13 +37,13 @@ using ListCommand = void (*)(const ListSetting& setting, const Globals& globals,
 
 void showList(const ListSetting& setting, const Globals& globals, const SettingOptions& options);
 
-/// Puts the words in the place of the list. Throws Failure where one of them is no element or is given twice.
+/// Replaces the list by the words. Throws Failure if one of them is no valid element or is given twice.
 void setList(const ListSetting& setting, const Globals& globals, const SettingOptions& options);
 
 /// Adds those that are not there yet at the end. Throws Failure as setList does.
 void addToList(const ListSetting& setting, const Globals& globals, const SettingOptions& options);
 
-/// Throws Failure where one of them is not there.
+/// Throws Failure if one of them is not in the list.
 void removeFromList(const ListSetting& setting, const Globals& globals, const SettingOptions& options);
 
 /// Registers a subcommand that shows the list, or one that changes it by words. `setting` must last.
@@ -51,8 +51,8 @@ Subcommand addShow(Subcommand& parent, const ListSetting& setting);
 Subcommand addChange(Subcommand& parent, const ListSetting& setting, const char* name, const char* description,
                      Many many, ListCommand command);
 
-/// The instance that holds the settings of an interface. Where the host and its service processor have one of the same
-/// name, the host's: both would be kept in the same file. Throws Failure where there is none.
+/// The instance with the settings of an interface. If the host and its service processor have one of the same name, the
+/// host's: both use the same file. Throws Failure if there is none.
 broker::Instance settingOfInterface(Session& session, const std::string& interface);
 
 /// Changes one property and shows what came of it.

@@ -14,7 +14,7 @@ inline constexpr OutputFormat kAllFormats[] = {OutputFormat::Table, OutputFormat
 /// The option's value for a format: "json".
 const char* formatName(OutputFormat format) noexcept;
 
-/// The format of that word; nothing where there is none.
+/// The format of that word; nothing if there is none.
 std::optional<OutputFormat> formatNamed(std::string_view word) noexcept;
 
 }  // namespace zorva::cli

@@ -7,7 +7,7 @@
 
 namespace zorva::cli {
 
-/// The options of zorvactl itself, which stand before or after the subcommand.
+/// The options of zorvactl itself, which are given before or after the subcommand.
 struct Globals {
   OutputFormat output = OutputFormat::Table;
   std::string config;             ///< the agent's configuration; empty: as the environment says

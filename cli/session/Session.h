@@ -116,8 +116,8 @@ auto asFailure(Work work) {
   }
 }
 
-/// Of each instance only these properties; all of them where none is named. Throws Failure (wrong usage) where neither
-/// `top` nor a class below it, or, without one, no class at all, has a property of such a name.
+/// The properties to include of each instance; empty means all. Throws Failure (wrong usage) if neither `top` nor one
+/// of its subclasses (without `top`: no class at all) has a property of such a name.
 broker::Selection selectionOf(Session& session, const std::vector<std::string>& properties, const schema::Class* top);
 
 }  // namespace zorva::cli

@@ -48,7 +48,7 @@ inline std::string done(const TestHost& host, const Words& words) {
   return outcome.out;
 }
 
-/// Checks that a run ends with this exit code and tells this.
+/// Checks that a run ends with this exit code and this message.
 inline void expectFailed(const TestHost& host, const Words& words, int exitCode, const std::string& told) {
   const Outcome outcome = host.run(words);
   EXPECT_EQ(outcome.exitCode, exitCode) << outcome.out;

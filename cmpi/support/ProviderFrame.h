@@ -1,6 +1,6 @@
 #pragma once
 
-// What providers share: function tables and create functions.
+// Shared by all providers: function tables and create functions.
 
 #include <cmpidt.h>
 #include <cmpift.h>
@@ -26,8 +26,8 @@ constexpr Table tableOf(Members... members) {
 
 }  // namespace zorva::cmpi
 
-/// The create function of a provider's Instance, Association or Method operations. It hands out this table, and puts
-/// the broker into that variable: the latest call wins.
+/// The create function of a provider's Instance, Association or Method operations. It returns this table, and stores
+/// the broker in that variable: the latest call wins.
 #define ZORVA_CREATE_MI(kind, prefix, table, brokerVariable)                                                     \
   ZORVA_PROVIDER_EXPORT CMPI##kind##MI* prefix##_Create_##kind##MI(const CMPIBroker* broker, const CMPIContext*, \
                                                                    CMPIStatus*) {                                \
