@@ -100,7 +100,7 @@ TEST(Toml, AValueOfAnotherTypeIsRefusedWithLineAndKey) {
   EXPECT_EQ(problemOf("[t]\nk = [1]\n", list), "2 t.k: expected a text in quotes");
 }
 
-TEST(Toml, WhatNobodyKnowsIsRefused) {
+TEST(Toml, UnknownKeysAreRefused) {
   EXPECT_EQ(problemOf("[t]\nk = 1\n", [](TomlTable&) {}), "2 t.k: is not a known key");
   EXPECT_EQ(problemOf("t = 1\n", [](TomlTable&) {}), "1 t: expected a table");
   EXPECT_EQ(problem([] { TomlDocument("[a]\n[b]\n").refuseAllBut({"a"}); }), "2 b: is not a known table or key");

@@ -73,7 +73,7 @@ broker::Instance settingOf(Session& session, const ListSetting& setting, const S
   return setting.isOfInterface ? settingOfInterface(session, options.interface) : settingOfHost(session);
 }
 
-/// Changes the list to what `changed` makes of it, with nobody else changing it meanwhile.
+/// Replaces the list by the result of `changed`. No other program can change it in the meantime.
 template <typename Changed>
 void changeList(const ListSetting& setting, const Globals& globals, const SettingOptions& options, Changed changed) {
   Session session(globals);
