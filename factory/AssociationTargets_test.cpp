@@ -4,11 +4,8 @@
 #include <string>
 #include <utility>
 
-#include "Matchers.h"
-#include "RecordingBroker.h"
-#include "RecordingLogger.h"
-#include "World.h"
 #include "factory/DNSClientObjFactory.h"
+#include "tests/support/Matchers.h"
 #include "tests/support/RecordingBroker.h"
 #include "tests/support/RecordingLogger.h"
 #include "tests/support/World.h"

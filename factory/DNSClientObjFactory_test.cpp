@@ -2,10 +2,10 @@
 
 #include <functional>
 
-#include "Matchers.h"
-#include "RecordingBroker.h"
-#include "RecordingLogger.h"
-#include "World.h"
+#include "tests/support/Matchers.h"
+#include "tests/support/RecordingBroker.h"
+#include "tests/support/RecordingLogger.h"
+#include "tests/support/World.h"
 
 namespace ZV::Test {
 namespace {

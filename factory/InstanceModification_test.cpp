@@ -1,8 +1,8 @@
 #include "factory/InstanceModification.h"
 
-#include "Matchers.h"
-#include "ProviderCall.h"
-#include "World.h"
+#include "tests/support/Matchers.h"
+#include "tests/support/ProviderCall.h"
+#include "tests/support/World.h"
 
 namespace ZV::Test {
 namespace {

@@ -1,9 +1,6 @@
 #include "model/DNSClient.h"
 
-#include "Matchers.h"
-#include "RecordingLogger.h"
-#include "World.h"
-
+#include "tests/support/Matchers.h"
 #include "tests/support/RecordingLogger.h"
 #include "tests/support/World.h"
 

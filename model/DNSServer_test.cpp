@@ -2,9 +2,9 @@
 
 #include <vector>
 
-#include "Matchers.h"
-#include "RecordingLogger.h"
-#include "World.h"
+#include "tests/support/Matchers.h"
+#include "tests/support/RecordingLogger.h"
+#include "tests/support/World.h"
 
 namespace ZV::Test {
 namespace {

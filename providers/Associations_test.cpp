@@ -1,4 +1,5 @@
 // What all eight associations have in common: whom they let a request lead to, and what of a request they do not read.
+
 #include <algorithm>
 #include <cctype>
 

@@ -1,4 +1,5 @@
 // The endpoint's extrinsic methods: accepted, checked and answered, and nothing changes.
+
 #include "providers/testing/InstanceTest.h"
 
 namespace ZV::Test {

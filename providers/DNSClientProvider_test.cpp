@@ -1,4 +1,5 @@
 // What a client reads of the endpoints.
+
 #include "providers/testing/InstanceTest.h"
 
 namespace ZV::Test {

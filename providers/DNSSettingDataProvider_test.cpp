@@ -1,4 +1,5 @@
 // ZORVA_DNSSettingData as a CIM server reads it.
+
 #include <sys/inotify.h>
 #include <unistd.h>
 

@@ -1,9 +1,10 @@
 // What all twelve providers have alike: create functions, function tables, and the operations that do no work.
+
 #include <set>
 
-#include "Matchers.h"
-#include "Providers.h"
-#include "World.h"
+#include "tests/support/Matchers.h"
+#include "tests/support/Providers.h"
+#include "tests/support/World.h"
 
 namespace ZV::Test {
 namespace {

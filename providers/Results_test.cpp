@@ -1,8 +1,8 @@
 #include "providers/Results.h"
 
-#include "Matchers.h"
-#include "RecordingBroker.h"
-#include "World.h"
+#include "tests/support/Matchers.h"
+#include "tests/support/RecordingBroker.h"
+#include "tests/support/World.h"
 
 namespace ZV::Test {
 namespace {

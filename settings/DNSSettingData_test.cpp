@@ -1,9 +1,7 @@
 #include "settings/DNSSettingData.h"
 
-#include "Matchers.h"
-#include "RecordingLogger.h"
-#include "World.h"
 #include "settings/testing/FileAtEachLine.h"
+#include "tests/support/Matchers.h"
 #include "tests/support/RecordingLogger.h"
 #include "tests/support/World.h"
 

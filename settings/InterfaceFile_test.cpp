@@ -16,10 +16,10 @@
 #include <random>
 #include <thread>
 
-#include "CimValues.h"
-#include "Matchers.h"
-#include "RecordingLogger.h"
-#include "World.h"
+#include "tests/support/CimValues.h"
+#include "tests/support/Matchers.h"
+#include "tests/support/RecordingLogger.h"
+#include "tests/support/World.h"
 
 namespace ZV::Test {
 namespace {

@@ -1,8 +1,6 @@
 // What the providers really set, held against the classes that they publish: a property that a class lacks, or has with
 // another type, would be refused by the broker and lost on its way to the client.
-#include <Providers.h>
-#include <RecordingBroker.h>
-#include <World.h>
+
 #include <gtest/gtest.h>
 
 #include <memory>
@@ -12,6 +10,7 @@
 #include "schema/ClassRepository.h"
 #include "schema/Schema.h"
 #include "tests/support/ProviderCall.h"
+#include "tests/support/Providers.h"
 #include "tests/support/RecordingBroker.h"
 #include "tests/support/World.h"
 

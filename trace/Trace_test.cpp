@@ -6,8 +6,8 @@
 #include <thread>
 #include <vector>
 
-#include "Matchers.h"
-#include "RecordingLogger.h"
+#include "tests/support/Matchers.h"
+#include "tests/support/RecordingLogger.h"
 
 namespace ZV::Test {
 namespace {

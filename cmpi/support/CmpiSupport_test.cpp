@@ -2,8 +2,8 @@
 
 #include <vector>
 
-#include "Matchers.h"
-#include "RecordingBroker.h"
+#include "tests/support/Matchers.h"
+#include "tests/support/RecordingBroker.h"
 
 namespace ZV::Test {
 namespace {

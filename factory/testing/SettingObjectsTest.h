@@ -1,17 +1,18 @@
-// What the tests of the objects of the two setting classes share.
 #pragma once
+
+// What the tests of the objects of the two setting classes share.
 
 #include <memory>
 #include <string>
 #include <utility>
 
-#include "Matchers.h"
-#include "ProviderCall.h"
-#include "World.h"
+#include "tests/support/Matchers.h"
+#include "tests/support/ProviderCall.h"
+#include "tests/support/World.h"
 
 namespace ZV::Test {
 
-// Makes instances from the first setting of Data that a walk of the host finds.
+/// Makes instances from the first setting of Data that a walk of the host finds.
 template <typename Data>
 class SettingObjectsTest : public ::testing::Test {
  protected:
@@ -22,7 +23,7 @@ class SettingObjectsTest : public ::testing::Test {
     world_->nic("eth0", usualNic()).install();
   }
 
-  // A host without anything in the place of the one with a usual interface.
+  /// A host without anything in the place of the one with a usual interface.
   World& newWorld() {
     world_.reset();
     world_ = std::make_unique<World>();

@@ -1,27 +1,28 @@
+#pragma once
+
 // The association providers, asked for what belongs together. The order of their calls, their log lines and how they
 // end are told in tests/conformance/.
-#pragma once
 
 #include <string>
 #include <vector>
 
-#include "Matchers.h"
-#include "Providers.h"
-#include "RecordingBroker.h"
-#include "RecordingLogger.h"
-#include "World.h"
+#include "tests/support/Matchers.h"
+#include "tests/support/Providers.h"
+#include "tests/support/RecordingBroker.h"
+#include "tests/support/RecordingLogger.h"
+#include "tests/support/World.h"
 
 namespace ZV::Test {
 
 using Names = std::vector<std::string>;
 
-// What tells an object from its siblings: its Name or InstanceID, or its class where it has no keys.
+/// What tells an object from its siblings: its Name or InstanceID, or its class where it has no keys.
 inline std::string nameOf(const Path& path) {
   if (path.keys.empty()) return path.className;
   return (path["InstanceID"].isNull() ? path["Name"] : path["InstanceID"]).text();
 }
 
-// One association provider on a world that the test fills and installs.
+/// One association provider on a world that the test fills and installs.
 class AssociationTest : public ::testing::Test {
  protected:
   explicit AssociationTest(const std::string& prefix) : AssociationTest(*findProvider(prefix)) {}
@@ -33,7 +34,7 @@ class AssociationTest : public ::testing::Test {
     return associationClass().key(under.leftRole, ref(left)).key(under.rightRole, ref(right));
   }
 
-  // Associations as `left > right`, each end by its name, in the order in which a request gave them.
+  /// Associations as `left > right`, each end by its name, in the order in which a request gave them.
   Names pairsIn(const Outcome& outcome) const {
     Names all;
     const auto add = [&](const Value& left, const Value& right) {
@@ -43,7 +44,7 @@ class AssociationTest : public ::testing::Test {
     for (const Instance& one : outcome.instances()) add(one[under.leftRole], one[under.rightRole]);
     return all;
   }
-  // Objects by their names.
+  /// Objects by their names.
   static Names namesIn(const Outcome& outcome) {
     Names all;
     for (const Path& path : outcome.paths()) all.push_back(nameOf(path));
@@ -51,27 +52,27 @@ class AssociationTest : public ::testing::Test {
     return all;
   }
 
-  // The pairs that EnumInstances and EnumInstanceNames give.
+  /// The pairs that EnumInstances and EnumInstanceNames give.
   Names built() { return pairsIn(instances.enumerateInstances(associationClass())); }
   Names named() { return pairsIn(instances.enumerateInstanceNames(associationClass())); }
-  // Both, where they agree.
+  /// Both, where they agree.
   Names enumerated() {
     const Names all = built();
     EXPECT_EQ(all, named());
     return all;
   }
-  // Whether GetInstance finds the pair.
+  /// Whether GetInstance finds the pair.
   bool isFound(const Path& left, const Path& right) {
     return instances.getInstance(pairOf(left, right)).instances().size() == 1;
   }
 
-  // The far ends that Associators and AssociatorNames give, which have to agree.
+  /// The far ends that Associators and AssociatorNames give, which have to agree.
   Names associated(const Path& source, const AssociationQuery& query = {}) {
     const Names all = namesIn(associations.associators(source, query));
     EXPECT_EQ(all, namesIn(associations.associatorNames(source, query)));
     return all;
   }
-  // The pairs that References and ReferenceNames give, which have to agree.
+  /// The pairs that References and ReferenceNames give, which have to agree.
   Names referred(const Path& source) {
     const Names all = pairsIn(associations.references(source));
     EXPECT_EQ(all, pairsIn(associations.referenceNames(source)));

@@ -1,14 +1,15 @@
-// One of the four instance providers on a world that a test fills and installs.
 #pragma once
+
+// One of the four instance providers on a world that a test fills and installs.
 
 #include <string>
 #include <vector>
 
-#include "Matchers.h"
-#include "Providers.h"
-#include "RecordingBroker.h"
-#include "RecordingLogger.h"
-#include "World.h"
+#include "tests/support/Matchers.h"
+#include "tests/support/Providers.h"
+#include "tests/support/RecordingBroker.h"
+#include "tests/support/RecordingLogger.h"
+#include "tests/support/World.h"
 
 namespace ZV::Test {
 
@@ -22,7 +23,7 @@ class InstanceTest : public ::testing::Test {
     return provider.enumerateInstances(classPath(), properties).instances();
   }
   std::vector<Path> paths() { return provider.enumerateInstanceNames(classPath()).paths(); }
-  // What GetInstance gives: one instance or none.
+  /// What GetInstance gives: one instance or none.
   std::vector<Instance> found(const Path& path, const PropertyList& properties = nullptr) {
     return provider.getInstance(path, properties).instances();
   }

@@ -2,7 +2,7 @@
 
 #include <functional>
 
-#include "Matchers.h"
+#include "tests/support/Matchers.h"
 
 namespace ZV::Test {
 

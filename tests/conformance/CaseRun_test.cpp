@@ -1,6 +1,6 @@
 #include "CaseRun.h"
 
-#include "Matchers.h"
+#include "tests/support/Matchers.h"
 
 namespace ZV::Test {
 

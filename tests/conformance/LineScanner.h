@@ -30,7 +30,7 @@ class LineScanner {
   std::string wordOrQuoted(const std::string& what);             ///< a name that has no blanks needs no quotes
   std::vector<std::string> quotedList(const std::string& what);  ///< {"a", "b"}
   Value value();  ///< string "a", uint16 3, string[] {"a", null}, boolean true, ref (PATH), null
-  Path path();    ///< //host/root/cimv2:CLASS.Key="a",Other=(PATH); without a namespace root/cimv2
+  Path path();    ///< ///< host/root/cimv2:CLASS.Key="a",Other=(PATH); without a namespace root/cimv2
 
   [[noreturn]] void fail(const std::string& what) const;
 

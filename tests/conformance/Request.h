@@ -9,9 +9,9 @@
 #include <vector>
 
 #include "CaseFile.h"
-#include "Providers.h"
 #include "tests/support/CimValues.h"
 #include "tests/support/ProviderCall.h"
+#include "tests/support/Providers.h"
 #include "tests/support/RecordingBroker.h"
 
 namespace ZV::Test {
@@ -63,9 +63,9 @@ struct RequestObjects {
   CMPIArgs* out;
 };
 
-// Makes the provider and asks it. Exceptions pass.
+/// Makes the provider and asks it. Exceptions pass.
 CMPIStatus ask(const Provider& provider, RecordingBroker& broker, Request& request, const RequestObjects& objects);
-// Whether the provider has the table that the operation stands in.
+/// Whether the provider has the table that the operation stands in.
 bool canAsk(const Provider& provider, Operation operation);
 
 }  // namespace ZV::Test

@@ -6,8 +6,8 @@
 
 #include "FaultTest.h"
 #include "FileCalls.h"
-#include "Matchers.h"
 #include "agent/Agent.h"
+#include "tests/support/Matchers.h"
 
 namespace ZV::Test {
 namespace {

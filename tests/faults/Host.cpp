@@ -7,9 +7,9 @@
 #include <fstream>
 #include <iterator>
 
-#include "ProfileObjects.h"
 #include "agent/Agent.h"
 #include "agent/files/FileWatch.h"
+#include "tests/support/ProfileObjects.h"
 
 namespace ZV::Test {
 namespace {

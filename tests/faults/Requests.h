@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "Providers.h"
+#include "tests/support/Providers.h"
 
 namespace ZV::Test {
 

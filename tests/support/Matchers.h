@@ -1,5 +1,6 @@
-// The matchers of GoogleMock that tests of this namespace call by their plain names.
 #pragma once
+
+// The matchers of GoogleMock that tests of this namespace call by their plain names.
 
 #include <gmock/gmock.h>
 

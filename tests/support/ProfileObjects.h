@@ -1,10 +1,11 @@
-// Objects of the profile's classes, as a client or another provider names them.
 #pragma once
+
+// Objects of the profile's classes, as a client or another provider names them.
 
 #include <string>
 #include <vector>
 
-#include "CimValues.h"
+#include "tests/support/CimValues.h"
 
 namespace ZV::Test {
 
@@ -43,7 +44,7 @@ inline Path ipAssignmentPath(const std::string& instanceID) {
   return Path(kIpAssignmentClass).key("InstanceID", instanceID.c_str());
 }
 
-// The objects of paths, with their keys as properties, as another provider serves them.
+/// The objects of paths, with their keys as properties, as another provider serves them.
 inline Instance objectOf(const Path& path) {
   Instance object(path.className);
   for (const auto& [name, value] : path.keys) object = object.with(name, value);

@@ -2,8 +2,8 @@
 
 #include <cmpimacs.h>
 
-#include "Matchers.h"
 #include "agent/interface/ZALogger.h"
+#include "tests/support/Matchers.h"
 
 namespace ZV::Test {
 namespace {

@@ -1,5 +1,6 @@
-// The twelve providers by the names that a server, a client and the log know them by.
 #pragma once
+
+// The twelve providers by the names that a server, a client and the log know them by.
 
 #include <gtest/gtest.h>
 
@@ -8,8 +9,8 @@
 #include <string_view>
 #include <vector>
 
-#include "ProfileObjects.h"
-#include "ProviderCall.h"
+#include "tests/support/ProfileObjects.h"
+#include "tests/support/ProviderCall.h"
 
 #define ZV_CREATES_INSTANCE_MI(prefix) \
   extern "C" CMPIInstanceMI* prefix##_Create_InstanceMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
@@ -37,27 +38,27 @@ ZV_CREATES_BOTH_MIS(DNSOrderedComponentProvider)
 namespace ZV::Test {
 
 struct Provider {
-  const char* prefix;  // of its create functions
+  const char* prefix;  ///< of its create functions
   const char* className;
-  const char* stem;    // of its operations' names
-  const char* source;  // its file, without folder and ending
+  const char* stem;    ///< of its operations' names
+  const char* source;  ///< its file, without folder and ending
   InstanceProvider::Create createInstanceMI;
-  AssociationProvider::Create createAssociationMI;  // null where it has none
-  MethodProvider::Create createMethodMI;            // null where it has none
-  // Of an association: its two references in the order in which they are set, and an object of each end on a host with
-  // the interface eth0 and the server 192.0.2.53. Of the others: an object of the class on that host.
+  AssociationProvider::Create createAssociationMI;  ///< null where it has none
+  MethodProvider::Create createMethodMI;            ///< null where it has none
+  /// Of an association: its two references in the order in which they are set, and an object of each end on a host with
+  /// the interface eth0 and the server 192.0.2.53. Of the others: an object of the class on that host.
   Path left;
   const char* leftRole = nullptr;
   Path right = {};
   const char* rightRole = nullptr;
 
   bool isAssociation() const { return createAssociationMI != nullptr; }
-  // An object of the class: the association of its two ends, or the object that left names.
+  /// An object of the class: the association of its two ends, or the object that left names.
   Path object() const {
     return isAssociation() ? Path(className).key(leftRole, ref(left)).key(rightRole, ref(right)) : left;
   }
   std::string file() const { return "providers/" + std::string(source) + ".cpp"; }
-  // The source's name, but for the one whose category keeps the long word.
+  /// The source's name, but for the one whose category keeps the long word.
   std::string category() const {
     const std::string_view name = source;
     return "Zorvagent." +
@@ -121,7 +122,7 @@ inline const std::vector<Provider>& allProviders() {
   return all;
 }
 
-// The provider with that prefix; null where there is none.
+/// The provider with that prefix; null where there is none.
 inline const Provider* findProvider(std::string_view prefix) {
   for (const Provider& provider : allProviders()) {
     if (prefix == provider.prefix) return &provider;

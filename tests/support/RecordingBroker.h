@@ -158,12 +158,12 @@ class RecordingBroker {
   void failNever();
   bool hasFailed() const;  ///< whether any failure was reached since startOver
 
-  // Paths of a class that newObjectPath gave lose their handles when it gives one of another class: a broker that takes
-  // its memory back too early.
+  /// Paths of a class that newObjectPath gave lose their handles when it gives one of another class: a broker that
+  /// takes its memory back too early.
   void loseHandles(const std::string& victims, const std::string& occasion) { lossOfHandles_ = {victims, occasion}; }
 
-  Calls calls() const;            // since the last request began, or since startOver
-  std::size_t callCount() const;  // since startOver
+  Calls calls() const;            ///< since the last request began, or since startOver
+  std::size_t callCount() const;  ///< since startOver
   std::size_t callsOf(const std::string& name) const { return calls().count(name); }
 
   /// Drops the recorded calls and numbers new objects from 1 again, as at the beginning of a request. Requested
@@ -186,7 +186,7 @@ class RecordingBroker {
   template <typename Object>
   Object* add(std::unique_ptr<Object> object, const char* kind, const std::string& label);
   PathObject* addPath(Path path, const std::string& label = {});
-  PathObject* addNewPath(Path path);  // for newObjectPath
+  PathObject* addNewPath(Path path);  ///< for newObjectPath
   InstanceObject* addInstance(Instance instance, const std::string& label = {});
   StringObject* addString(std::string text);
   ArrayObject* addArray(CMPIType elementType, std::vector<Value> elements, const std::string& label = {});
@@ -207,7 +207,7 @@ class RecordingBroker {
   std::optional<std::pair<std::size_t, Mode>> failAt_;
   std::map<std::string, Mode> failNext_;
   std::map<std::string, Mode> failEach_;
-  std::pair<std::string, std::string> lossOfHandles_;  // of which class, at which
+  std::pair<std::string, std::string> lossOfHandles_;  ///< of which class, at which
   std::vector<PathObject*> pathsToLose_;
   std::map<std::string, int> numbers_;
   std::vector<std::unique_ptr<BrokerObject>> objects_;

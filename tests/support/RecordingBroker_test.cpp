@@ -4,8 +4,8 @@
 
 #include <thread>
 
-#include "BrokerObjects.h"
-#include "Matchers.h"
+#include "tests/support/BrokerObjects.h"
+#include "tests/support/Matchers.h"
 
 namespace ZV::Test {
 namespace {

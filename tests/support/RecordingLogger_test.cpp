@@ -1,7 +1,7 @@
 #include "tests/support/RecordingLogger.h"
 
-#include "Matchers.h"
 #include "agent/interface/ZALogger.h"
+#include "tests/support/Matchers.h"
 
 namespace ZV::Test {
 namespace {

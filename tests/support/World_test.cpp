@@ -2,11 +2,10 @@
 
 #include <filesystem>
 
-#include "Matchers.h"
-#include "RecordingLogger.h"
 #include "agent/interface/Instrumentation.h"
 #include "agent/interface/PlatformUtilities.h"
 #include "agent/interface/ZALogger.h"
+#include "tests/support/Matchers.h"
 #include "tests/support/RecordingLogger.h"
 
 namespace ZV::Test {
