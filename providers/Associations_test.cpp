@@ -16,7 +16,7 @@ std::string changed(std::string text, int (*change)(int)) {
 std::string lowerCase(const std::string& text) { return changed(text, &std::tolower); }
 std::string upperCase(const std::string& text) { return changed(text, &std::toupper); }
 
-// The standard class that stands for one of ours in a result class.
+// The standard class that a provider's own class implements; a result class may name it.
 std::string standardNameOf(const std::string& className) {
   return (className == kEndpointClass ? "CIM_DNSProtocolEndpoint" : "CIM_" + className.substr(6));
 }

@@ -181,7 +181,7 @@ class Worker:
                               text=True, errors="replace", timeout=timeout)
 
     def prepare(self):
-        # Nobody debugs a mutant: without debug information it is built in half the time.
+        # A mutant is never debugged: without debug information it is built in half the time.
         steps = [["cmake", "-S", str(self.tree), "-B", str(self.build), "-G", "Ninja", "-DCMAKE_BUILD_TYPE=Debug",
                   "-DCMAKE_CXX_FLAGS_DEBUG=-O0", "-DZORVA_TEST_DEBUG_INFO=-g0"],
                  ["cmake", "--build", str(self.build), "-j1", "--target", *self.programs]]

@@ -65,7 +65,7 @@ struct RequestObjects {
 
 /// Makes the provider and asks it. Exceptions pass.
 CMPIStatus ask(const Provider& provider, RecordingBroker& broker, Request& request, const RequestObjects& objects);
-/// Whether the provider has the table that the operation stands in.
+/// Whether the provider has the function table of the operation.
 bool canAsk(const Provider& provider, Operation operation);
 
 }  // namespace ZV::Test
