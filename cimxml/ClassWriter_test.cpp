@@ -34,8 +34,8 @@ class ClassWriterTest : public ::testing::Test {
  protected:
   ClassWriterTest() {
     schema::RepositorySink sink(classes_);
-    const auto error = schema::parseMof(kMof, "test.mof", sink);
-    EXPECT_FALSE(error) << error->text();
+    const auto outcome = schema::parseMof(kMof, "test.mof", sink);
+    EXPECT_TRUE(outcome) << outcome.error().text();
   }
 
   std::string written(const char* name, const ClassDetail& detail) {

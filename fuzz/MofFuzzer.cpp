@@ -23,15 +23,15 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   const std::string_view text(reinterpret_cast<const char*>(data), size);
   ClassRepository classes;
   RepositorySink sink(classes);
-  if (const auto error = parseMof(text, "fuzz.mof", sink)) {
-    if (error->message.empty()) std::abort();
+  if (const auto outcome = parseMof(text, "fuzz.mof", sink); !outcome) {
+    if (outcome.error().message.empty()) std::abort();
     return 0;
   }
   const std::string first = written(classes);
   ClassRepository again;
   RepositorySink secondSink(again);
-  if (const auto error = parseMof(first, "written.mof", secondSink)) {
-    std::fprintf(stderr, "%s\n%s\n", error->text().c_str(), first.c_str());
+  if (const auto outcome = parseMof(first, "written.mof", secondSink); !outcome) {
+    std::fprintf(stderr, "%s\n%s\n", outcome.error().text().c_str(), first.c_str());
     std::abort();
   }
   if (written(again) != first) {

@@ -394,19 +394,19 @@ ClassDeclaration Class::declaration() const {
 ClassRepository::ClassRepository() = default;
 ClassRepository::~ClassRepository() = default;
 
-std::optional<SchemaError> ClassRepository::add(QualifierType type, std::string_view file) {
+Expected<void, SchemaError> ClassRepository::add(QualifierType type, std::string_view file) {
   if (findQualifierType(type.name) != nullptr) {
-    return SchemaError{std::string(file), type.place.line, type.place.column,
-                       "qualifier " + quote(type.name) + " is declared a second time"};
+    return unexpected(SchemaError{std::string(file), type.place.line, type.place.column,
+                                  "qualifier " + quote(type.name) + " is declared a second time"});
   }
   auto added = std::make_unique<QualifierType>(std::move(type));
   qualifierOrder_.push_back(added.get());
   const std::string_view name = added->name;
   qualifierTypes_.emplace(name, std::move(added));
-  return std::nullopt;
+  return {};
 }
 
-std::optional<SchemaError> ClassRepository::add(ClassDeclaration declaration, std::string_view file) {
+Expected<void, SchemaError> ClassRepository::add(ClassDeclaration declaration, std::string_view file) {
   std::unique_ptr<Class> added;
   try {
     ClassBuilder builder(*this, declaration);
@@ -416,7 +416,7 @@ std::optional<SchemaError> ClassRepository::add(ClassDeclaration declaration, st
     inheritedBytes_ += builder.inheritedBytes();
   } catch (Refusal& refusal) {
     refusal.error.file = std::string(file);
-    return std::move(refusal.error);
+    return unexpected(std::move(refusal.error));
   }
   if (const Class* above = added->superclass_) {
     classes_.find(above->name_)->second->subclasses_.push_back(added.get());
@@ -424,7 +424,7 @@ std::optional<SchemaError> ClassRepository::add(ClassDeclaration declaration, st
   order_.push_back(added.get());
   const std::string_view name = added->name_;
   classes_.emplace(name, std::move(added));
-  return std::nullopt;
+  return {};
 }
 
 const Class* ClassRepository::find(std::string_view name) const noexcept {

@@ -15,6 +15,7 @@
 #include <vector>
 
 #include "schema/Declarations.h"
+#include "util/Expected.h"
 #include "util/Names.h"
 
 namespace zorva::schema {
@@ -113,7 +114,7 @@ class ClassRepository {
   ClassRepository& operator=(const ClassRepository&) = delete;
 
   /// Adds a qualifier type. Refused if the name exists. `file` is used in the error.
-  std::optional<SchemaError> add(QualifierType type, std::string_view file = {});
+  Expected<void, SchemaError> add(QualifierType type, std::string_view file = {});
 
   /// Adds a class and computes its inherited elements. Everything that it names must exist already: its superclass, the
   /// classes of its references and the types of its qualifiers (a class may refer to itself). Refused, with the
@@ -122,7 +123,7 @@ class ClassRepository {
   /// type, arrayness or the value of a DisableOverride qualifier, that lacks the Override qualifier, or that names
   /// nothing to override; a further key below a class with keys; a reference in a class that is no association; more
   /// than 1,000 properties or methods, 250 qualifiers or parameters, or 100 classes in a chain.
-  std::optional<SchemaError> add(ClassDeclaration declaration, std::string_view file = {});
+  Expected<void, SchemaError> add(ClassDeclaration declaration, std::string_view file = {});
 
   /// Null if there is no such class.
   const Class* find(std::string_view name) const noexcept;

@@ -30,8 +30,8 @@ class ClassRepositoryTest : public ::testing::Test {
 
   std::string errorOf(std::string_view text) {
     RepositorySink sink(repository_);
-    const auto error = parseMof(text, "t.mof", sink);
-    return error ? error->text() : "no error";
+    const auto outcome = parseMof(text, "t.mof", sink);
+    return outcome ? "no error" : outcome.error().text();
   }
 
   const Class& get(std::string_view name) {
@@ -265,8 +265,8 @@ TEST_F(ClassRepositoryTest, TakesAClassThatComesFromNoText) {
   ClassDeclaration made;
   made.name = "Made";
   made.properties.emplace_back().name = "Name";
-  EXPECT_EQ(repository_.add(made), std::nullopt);
-  EXPECT_EQ(repository_.add(made)->text(), "class 'Made' is declared a second time");
+  EXPECT_TRUE(repository_.add(made));
+  EXPECT_EQ(repository_.add(made).error().text(), "class 'Made' is declared a second time");
 }
 
 TEST_F(ClassRepositoryTest, KeepsQualifierTypesInOrder) {

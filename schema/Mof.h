@@ -8,7 +8,6 @@
 
 #include <cstddef>
 #include <functional>
-#include <optional>
 #include <string>
 #include <string_view>
 
@@ -17,14 +16,14 @@
 
 namespace zorva::schema {
 
-/// Takes the declarations of a text, each as soon as it is read, in the text's order. A function that returns a message
+/// Takes the declarations of a text, each as soon as it is read, in the text's order. A function that returns an error
 /// refuses the declaration and ends the reading; the reader adds file, line and column unless the error has them.
 class MofSink {
  public:
   virtual ~MofSink() = default;
-  virtual std::optional<SchemaError> qualifierType(QualifierType type, std::string_view file) = 0;
-  virtual std::optional<SchemaError> classDeclaration(ClassDeclaration declaration, std::string_view file) = 0;
-  virtual std::optional<SchemaError> instance(InstanceDeclaration instance, std::string_view file) = 0;
+  virtual Expected<void, SchemaError> qualifierType(QualifierType type, std::string_view file) = 0;
+  virtual Expected<void, SchemaError> classDeclaration(ClassDeclaration declaration, std::string_view file) = 0;
+  virtual Expected<void, SchemaError> instance(InstanceDeclaration instance, std::string_view file) = 0;
 };
 
 /// A sink that adds qualifier types and classes to a repository and refuses instances.
@@ -32,9 +31,9 @@ class RepositorySink : public MofSink {
  public:
   /// `repository` must outlive the sink.
   explicit RepositorySink(ClassRepository& repository) : repository_(repository) {}
-  std::optional<SchemaError> qualifierType(QualifierType type, std::string_view file) override;
-  std::optional<SchemaError> classDeclaration(ClassDeclaration declaration, std::string_view file) override;
-  std::optional<SchemaError> instance(InstanceDeclaration instance, std::string_view file) override;
+  Expected<void, SchemaError> qualifierType(QualifierType type, std::string_view file) override;
+  Expected<void, SchemaError> classDeclaration(ClassDeclaration declaration, std::string_view file) override;
+  Expected<void, SchemaError> instance(InstanceDeclaration instance, std::string_view file) override;
 
  private:
   ClassRepository& repository_;
@@ -59,12 +58,12 @@ struct MofLimits {
 
 /// Reads `text` and passes its declarations to `sink`. `file` is the name in errors. Without `includer` an include is
 /// an error. Returns the first error, of the text or of the sink; declarations that the sink got before stay there.
-std::optional<SchemaError> parseMof(std::string_view text, std::string_view file, MofSink& sink,
+Expected<void, SchemaError> parseMof(std::string_view text, std::string_view file, MofSink& sink,
                                     const MofIncluder& includer = {}, const MofLimits& limits = {});
 
 /// Reads the file at `path`; its includes are relative to the file that contains them. Only regular files are read, so
 /// nothing blocks.
-std::optional<SchemaError> parseMofFile(const std::string& path, MofSink& sink, const MofLimits& limits = {});
+Expected<void, SchemaError> parseMofFile(const std::string& path, MofSink& sink, const MofLimits& limits = {});
 
 /// A declaration as MOF, ended by a line feed. Long texts are split at blanks so that lines stay within 100 columns if
 /// possible. parseMof reads the result back to the same declaration.

@@ -74,7 +74,7 @@ class MofParser {
   void takeWord(std::string_view word, What where);
   bool takeWordIf(std::string_view word);
   std::string takeName(What what);
-  void hand(std::optional<SchemaError> refusal, Place place) const;
+  void hand(Expected<void, SchemaError> taken, Place place) const;
 
   MofLexer lexer_;
   MofSink& sink_;
@@ -440,14 +440,15 @@ std::string MofParser::takeName(What what) {
   return name;
 }
 
-void MofParser::hand(std::optional<SchemaError> refusal, Place at) const {
-  if (!refusal) return;
-  if (refusal->file.empty()) refusal->file = std::string(lexer_.file());
-  if (refusal->line == 0) {
-    refusal->line = at.line;
-    refusal->column = at.column;
+void MofParser::hand(Expected<void, SchemaError> taken, Place at) const {
+  if (taken) return;
+  SchemaError& refusal = taken.error();
+  if (refusal.file.empty()) refusal.file = std::string(lexer_.file());
+  if (refusal.line == 0) {
+    refusal.line = at.line;
+    refusal.column = at.column;
   }
-  throw MofFailure{std::move(*refusal)};
+  throw MofFailure{std::move(refusal)};
 }
 
 // A file's text, up to one byte over the limit, or why there is none.
@@ -470,33 +471,33 @@ std::string besideFile(std::string_view name, std::string_view from) {
 
 }  // namespace
 
-std::optional<SchemaError> RepositorySink::qualifierType(QualifierType type, std::string_view file) {
+Expected<void, SchemaError> RepositorySink::qualifierType(QualifierType type, std::string_view file) {
   return repository_.add(std::move(type), file);
 }
 
-std::optional<SchemaError> RepositorySink::classDeclaration(ClassDeclaration declaration, std::string_view file) {
+Expected<void, SchemaError> RepositorySink::classDeclaration(ClassDeclaration declaration, std::string_view file) {
   return repository_.add(std::move(declaration), file);
 }
 
-std::optional<SchemaError> RepositorySink::instance(InstanceDeclaration instance, std::string_view file) {
-  return SchemaError{std::string(file), instance.place.line, instance.place.column,
-                     "an instance of '" + instance.className + "' is among the classes"};
+Expected<void, SchemaError> RepositorySink::instance(InstanceDeclaration instance, std::string_view file) {
+  return unexpected(SchemaError{std::string(file), instance.place.line, instance.place.column,
+                                "an instance of '" + instance.className + "' is among the classes"});
 }
 
-std::optional<SchemaError> parseMof(std::string_view text, std::string_view file, MofSink& sink,
-                                    const MofIncluder& includer, const MofLimits& limits) {
+Expected<void, SchemaError> parseMof(std::string_view text, std::string_view file, MofSink& sink,
+                                     const MofIncluder& includer, const MofLimits& limits) {
   Budget budget{limits};
   try {
     parseText(text, file, sink, includer, budget);
   } catch (MofFailure& failure) {
-    return std::move(failure.error);
+    return unexpected(std::move(failure.error));
   }
-  return std::nullopt;
+  return {};
 }
 
-std::optional<SchemaError> parseMofFile(const std::string& path, MofSink& sink, const MofLimits& limits) {
+Expected<void, SchemaError> parseMofFile(const std::string& path, MofSink& sink, const MofLimits& limits) {
   const MofInclude top = readFile(path, limits.bytes);
-  if (!top.error.empty()) return SchemaError{path, 0, 0, "cannot read the file: " + top.error};
+  if (!top.error.empty()) return unexpected(SchemaError{path, 0, 0, "cannot read the file: " + top.error});
   return parseMof(
       top.text, path, sink,
       [&limits](std::string_view name, std::string_view from) {

@@ -19,18 +19,18 @@ using ::testing::HasSubstr;
 // Keeps the declarations of a text.
 class Collector : public MofSink {
  public:
-  std::optional<SchemaError> qualifierType(QualifierType type, std::string_view) override {
+  Expected<void, SchemaError> qualifierType(QualifierType type, std::string_view) override {
     qualifierTypes.push_back(std::move(type));
-    return std::nullopt;
+    return {};
   }
-  std::optional<SchemaError> classDeclaration(ClassDeclaration declaration, std::string_view file) override {
+  Expected<void, SchemaError> classDeclaration(ClassDeclaration declaration, std::string_view file) override {
     classes.push_back(std::move(declaration));
     files.emplace_back(file);
-    return std::nullopt;
+    return {};
   }
-  std::optional<SchemaError> instance(InstanceDeclaration one, std::string_view) override {
+  Expected<void, SchemaError> instance(InstanceDeclaration one, std::string_view) override {
     instances.push_back(std::move(one));
-    return std::nullopt;
+    return {};
   }
 
   std::vector<QualifierType> qualifierTypes;
@@ -41,15 +41,15 @@ class Collector : public MofSink {
 
 Collector read(std::string_view text) {
   Collector collector;
-  const auto error = parseMof(text, "t.mof", collector);
-  EXPECT_EQ(error ? error->text() : "", "");
+  const auto outcome = parseMof(text, "t.mof", collector);
+  EXPECT_EQ(outcome ? "" : outcome.error().text(), "");
   return collector;
 }
 
 std::string errorOf(std::string_view text) {
   Collector collector;
-  const auto error = parseMof(text, "t.mof", collector);
-  return error ? error->text() : "no error";
+  const auto outcome = parseMof(text, "t.mof", collector);
+  return outcome ? "no error" : outcome.error().text();
 }
 
 // The value of a property's initializer, untyped.
@@ -292,7 +292,7 @@ TEST(MofReader, ShortensWhatWasFoundWithoutBreakingACharacter) {
 
 TEST(MofReader, DeliversTheDeclarationsBeforeTheError) {
   Collector collector;
-  EXPECT_TRUE(parseMof("class A {}; class B {}; class", "t.mof", collector).has_value());
+  EXPECT_FALSE(parseMof("class A {}; class B {}; class", "t.mof", collector));
   EXPECT_EQ(collector.classes.size(), 2U);
 }
 
@@ -301,8 +301,8 @@ TEST(MofReader, PassesOverOtherDirectives) {
 }
 
 // Texts by name, as a tree of files would have them.
-std::optional<SchemaError> readTexts(const std::map<std::string, std::string>& texts, Collector& collector,
-                                     const MofLimits& limits = {}) {
+Expected<void, SchemaError> readTexts(const std::map<std::string, std::string>& texts, Collector& collector,
+                                      const MofLimits& limits = {}) {
   return parseMof(
       texts.at("top"), "top", collector,
       [&](std::string_view name, std::string_view) {
@@ -315,7 +315,7 @@ std::optional<SchemaError> readTexts(const std::map<std::string, std::string>& t
 
 TEST(MofInclude, BringsTheTextToItsPlace) {
   Collector collector;
-  EXPECT_FALSE(
+  EXPECT_TRUE(
       readTexts({{"top", "class A {};\n#pragma include (\"b\")\nclass C {};"}, {"b", "class B {};"}}, collector));
   ASSERT_EQ(collector.classes.size(), 3U);
   EXPECT_EQ(collector.classes[1].name, "B");
@@ -325,13 +325,13 @@ TEST(MofInclude, BringsTheTextToItsPlace) {
 
 TEST(MofInclude, NamesTheIncludedFileInItsErrors) {
   Collector collector;
-  EXPECT_EQ(readTexts({{"top", "#pragma include (\"b\")"}, {"b", "\nclass {"}}, collector)->text(),
+  EXPECT_EQ(readTexts({{"top", "#pragma include (\"b\")"}, {"b", "\nclass {"}}, collector).error().text(),
             "b:2:7: expected the name of a class, found '{'");
 }
 
 TEST(MofInclude, IsAnErrorIfTheTextCannotBeRead) {
   Collector collector;
-  EXPECT_EQ(readTexts({{"top", "\n #pragma include (\"b\")"}}, collector)->text(),
+  EXPECT_EQ(readTexts({{"top", "\n #pragma include (\"b\")"}}, collector).error().text(),
             "top:2:10: cannot include \"b\": there is no such text");
   EXPECT_EQ(errorOf("#pragma include (\"b\")"),
             "t.mof:1:9: cannot include \"b\": this text is read without included files");
@@ -339,7 +339,7 @@ TEST(MofInclude, IsAnErrorIfTheTextCannotBeRead) {
 
 TEST(MofInclude, IsBoundedInDepthNumberAndSize) {
   Collector collector;
-  EXPECT_EQ(readTexts({{"top", "#pragma include (\"top\")"}}, collector)->message,
+  EXPECT_EQ(readTexts({{"top", "#pragma include (\"top\")"}}, collector).error().message,
             "includes are nested deeper than 16 files");
   // Doubles at each level: 65,536 files if their number were not limited.
   EXPECT_EQ(readTexts({{"top", "#pragma include (\"a\")"},
@@ -347,10 +347,12 @@ TEST(MofInclude, IsBoundedInDepthNumberAndSize) {
                        {"b", "#pragma include (\"c\")\n#pragma include (\"c\")"},
                        {"c", ""}},
                       collector, {.includedFiles = 5})
-                ->message,
+                .error()
+                .message,
             "more than 5 files are included");
-  EXPECT_EQ(readTexts({{"top", "#pragma include (\"a\")"}, {"a", "class A {};"}}, collector, {.bytes = 30})->text(),
-            "a: the text, with what it includes, is longer than the 30 bytes allowed");
+  EXPECT_EQ(
+      readTexts({{"top", "#pragma include (\"a\")"}, {"a", "class A {};"}}, collector, {.bytes = 30}).error().text(),
+      "a: the text, with what it includes, is longer than the 30 bytes allowed");
 }
 
 class MofFile : public ::testing::Test {
@@ -372,8 +374,8 @@ TEST_F(MofFile, IsReadWithItsIncludesBesideIt) {
   write("sub/b.mof", "#pragma include (\"c.mof\")\nclass B {};");
   write("sub/c.mof", "class C {};");
   Collector collector;
-  const auto error = parseMofFile(write("a.mof", "#pragma include (\"sub/b.mof\")\nclass A {};"), collector);
-  EXPECT_FALSE(error) << error->text();
+  const auto outcome = parseMofFile(write("a.mof", "#pragma include (\"sub/b.mof\")\nclass A {};"), collector);
+  EXPECT_TRUE(outcome) << outcome.error().text();
   ASSERT_EQ(collector.classes.size(), 3U);
   EXPECT_EQ(collector.classes[0].name, "C");
   EXPECT_EQ(collector.files[0], folder_ + "/sub/c.mof");
@@ -381,19 +383,20 @@ TEST_F(MofFile, IsReadWithItsIncludesBesideIt) {
 
 TEST_F(MofFile, ThatCannotBeReadIsAnError) {
   Collector collector;
-  EXPECT_EQ(parseMofFile(folder_ + "/none.mof", collector)->text(),
+  EXPECT_EQ(parseMofFile(folder_ + "/none.mof", collector).error().text(),
             folder_ + "/none.mof: cannot read the file: No such file or directory");
-  EXPECT_EQ(parseMofFile(folder_, collector)->text(), folder_ + ": cannot read the file: it is no regular file");
+  EXPECT_EQ(parseMofFile(folder_, collector).error().text(), folder_ + ": cannot read the file: it is no regular file");
   ASSERT_EQ(mkfifo((folder_ + "/fifo").c_str(), 0600), 0);
-  EXPECT_EQ(parseMofFile(folder_ + "/fifo", collector)->text(),
+  EXPECT_EQ(parseMofFile(folder_ + "/fifo", collector).error().text(),
             folder_ + "/fifo: cannot read the file: it is no regular file");
-  EXPECT_EQ(parseMofFile("/dev/zero", collector)->text(), "/dev/zero: cannot read the file: it is no regular file");
+  EXPECT_EQ(parseMofFile("/dev/zero", collector).error().text(),
+            "/dev/zero: cannot read the file: it is no regular file");
 }
 
 TEST_F(MofFile, ThatIsTooLongIsAnError) {
   Collector collector;
   const std::string path = write("a.mof", std::string(200000, ' '));
-  EXPECT_EQ(parseMofFile(path, collector, {.bytes = 100000})->text(),
+  EXPECT_EQ(parseMofFile(path, collector, {.bytes = 100000}).error().text(),
             path + ": the text, with what it includes, is longer than the 100000 bytes allowed");
 }
 
@@ -401,11 +404,11 @@ TEST_F(MofFile, ThatIsTooLongIsAnError) {
 void readAnything(std::string_view text) {
   ClassRepository repository;
   RepositorySink sink(repository);
-  const auto error = parseMof(text, "t.mof", sink);
-  if (!error) return;
-  EXPECT_FALSE(error->message.empty());
-  EXPECT_GE(error->line, 1U);
-  EXPECT_LE(error->column, text.size() + 1);
+  const auto outcome = parseMof(text, "t.mof", sink);
+  if (outcome) return;
+  EXPECT_FALSE(outcome.error().message.empty());
+  EXPECT_GE(outcome.error().line, 1U);
+  EXPECT_LE(outcome.error().column, text.size() + 1);
 }
 
 std::string allBuiltInText() {

@@ -12,18 +12,18 @@ using ::testing::HasSubstr;
 // Writes the declarations that it gets; reading that text again must write the same.
 class Rewriter : public MofSink {
  public:
-  std::optional<SchemaError> qualifierType(QualifierType type, std::string_view) override {
+  Expected<void, SchemaError> qualifierType(QualifierType type, std::string_view) override {
     text += writeMof(type);
-    return std::nullopt;
+    return {};
   }
-  std::optional<SchemaError> classDeclaration(ClassDeclaration declaration, std::string_view) override {
+  Expected<void, SchemaError> classDeclaration(ClassDeclaration declaration, std::string_view) override {
     text += writeMof(declaration);
-    return std::nullopt;
+    return {};
   }
-  std::optional<SchemaError> instance(InstanceDeclaration one, std::string_view) override {
+  Expected<void, SchemaError> instance(InstanceDeclaration one, std::string_view) override {
     values.push_back(one.properties.empty() ? Value() : one.properties[0].value);
     text += writeMof(one);
-    return std::nullopt;
+    return {};
   }
   std::string text;
   std::vector<Value> values;
@@ -31,8 +31,8 @@ class Rewriter : public MofSink {
 
 std::string rewritten(std::string_view text) {
   Rewriter rewriter;
-  const auto error = parseMof(text, "t.mof", rewriter);
-  EXPECT_EQ(error ? error->text() : "", "");
+  const auto outcome = parseMof(text, "t.mof", rewriter);
+  EXPECT_EQ(outcome ? "" : outcome.error().text(), "");
   return rewriter.text;
 }
 
@@ -45,8 +45,8 @@ Value there(const Value& value) {
   one.properties[0].value = value;
   const std::string text = writeMof(one);
   Rewriter rewriter;
-  const auto error = parseMof(text, "t.mof", rewriter);
-  EXPECT_EQ(error ? error->text() : "", "") << text;
+  const auto outcome = parseMof(text, "t.mof", rewriter);
+  EXPECT_EQ(outcome ? "" : outcome.error().text(), "") << text;
   return rewriter.values.empty() ? Value() : rewriter.values[0];
 }
 

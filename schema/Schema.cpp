@@ -30,8 +30,8 @@ std::shared_ptr<const ClassRepository> loadBuiltInClasses(ClassSet set) {
   RepositorySink sink(*classes);
   const MofInclude top = builtInFile(set == ClassSet::Interop ? "interop.mof" : "profile.mof");
   const auto includer = [](std::string_view name, std::string_view) { return builtInFile(name); };
-  if (const auto error = parseMof(top.text, top.file, sink, includer)) {
-    throw std::logic_error("the built-in schema cannot be read: " + error->text());
+  if (const auto outcome = parseMof(top.text, top.file, sink, includer); !outcome) {
+    throw std::logic_error("the built-in schema cannot be read: " + outcome.error().text());
   }
   return classes;
 }

@@ -25,7 +25,8 @@ class Bench_TenThousand : Bench_Endpoint {};
 std::unique_ptr<zorva::broker::Broker> makeBroker(const zorva::server::Config&) {
   auto classes = std::make_shared<zorva::schema::ClassRepository>();
   zorva::schema::RepositorySink sink(*classes);
-  if (const auto error = zorva::schema::parseMof(kClasses, "bench.mof", sink)) throw std::logic_error(error->text());
+  const auto outcome = zorva::schema::parseMof(kClasses, "bench.mof", sink);
+  if (!outcome) throw std::logic_error(outcome.error().text());
   zorva::broker::BrokerOptions options;
   options.registry = zorva::broker::ProviderRegistry();
   for (const char* name : {"Bench_Few", "Bench_Many", "Bench_TenThousand"}) {

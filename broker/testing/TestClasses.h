@@ -61,7 +61,8 @@ class T_Keyless { string Note; };
 inline std::shared_ptr<const schema::ClassRepository> testClasses() {
   auto repository = std::make_shared<schema::ClassRepository>();
   schema::RepositorySink sink(*repository);
-  if (const auto error = schema::parseMof(kTestClasses, "test.mof", sink)) throw std::runtime_error(error->text());
+  const auto outcome = schema::parseMof(kTestClasses, "test.mof", sink);
+  if (!outcome) throw std::runtime_error(outcome.error().text());
   return repository;
 }
 

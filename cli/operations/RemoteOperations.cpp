@@ -78,9 +78,9 @@ std::unique_ptr<schema::ClassRepository> repositoryOf(schema::ClassDeclaration d
     for (const schema::Parameter& each : method.parameters) addReferred(each.referenceClass);
   }
   const std::string name = declared.name;
-  if (const auto error = repository->add(std::move(declared))) {
+  if (const auto added = repository->add(std::move(declared)); !added) {
     throw Failure(ExitCode::Failed, "the class " + printable(name) +
-                                        ", as the server has it, cannot be used: " + printable(error->message));
+                                        ", as the server has it, cannot be used: " + printable(added.error().message));
   }
   return repository;
 }

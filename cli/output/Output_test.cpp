@@ -53,11 +53,11 @@ TEST(JsonOutput, KeepsTheOrderOfTheProperties) {
 /// Takes the first instance of a MOF text.
 class OneInstance : public schema::MofSink {
  public:
-  std::optional<schema::SchemaError> qualifierType(schema::QualifierType, std::string_view) override { return {}; }
-  std::optional<schema::SchemaError> classDeclaration(schema::ClassDeclaration, std::string_view) override {
+  Expected<void, schema::SchemaError> qualifierType(schema::QualifierType, std::string_view) override { return {}; }
+  Expected<void, schema::SchemaError> classDeclaration(schema::ClassDeclaration, std::string_view) override {
     return {};
   }
-  std::optional<schema::SchemaError> instance(schema::InstanceDeclaration instance, std::string_view) override {
+  Expected<void, schema::SchemaError> instance(schema::InstanceDeclaration instance, std::string_view) override {
     found = std::move(instance);
     return {};
   }
@@ -71,8 +71,8 @@ TEST(MofOutput, IsReadBackAsTheSameInstance) {
                                         {"L", Value::textArray({"a", "b"}), nullptr},
                                         {"U", Value::null(schema::Type::String), nullptr}});
   OneInstance sink;
-  const auto error = schema::parseMof(instanceMof(instance), "written", sink);
-  ASSERT_FALSE(error) << error->text();
+  const auto outcome = schema::parseMof(instanceMof(instance), "written", sink);
+  ASSERT_TRUE(outcome) << outcome.error().text();
   EXPECT_EQ(sink.found.className, "C");
   ASSERT_EQ(sink.found.properties.size(), 5U);
   EXPECT_EQ(schema::textOf(sink.found.properties[0].value), "a\"\n\xF4\x8E\xBB\xBF");
