@@ -100,8 +100,8 @@ class Broker {
   /// order of the schema's keys. Fails as a request with that path does.
   Status canonicalPath(const ObjectPath& path, ObjectPath& canonical) const;
 
-  /// The broker as providers see it, for code that uses CMPI itself. CMPI objects can be made only while a Scope is
-  /// open on the thread (broker/objects/Scope.h).
+  /// The broker as providers see it. Its functions make CMPI objects only within a request: this is for providers and
+  /// for the tests of the function tables.
   const _CMPIBroker* handle() const noexcept;
 
  private:

@@ -7,10 +7,7 @@
 
 #include <climits>
 
-#include "broker/core/BrokerCore.h"
-#include "broker/objects/Convert.h"
-#include "broker/objects/Data.h"
-#include "broker/objects/Scope.h"
+#include "cimom/CmpiValues.h"
 #include "cimom/InteropModel.h"
 #include "schema/Schema.h"
 #include "util/Names.h"
@@ -28,6 +25,12 @@ constexpr const char* kEndpointNameSpace = "root/cimv2";
 
 constexpr CMPIStatus kOk{CMPI_RC_OK, nullptr};
 
+/// The namespaces of the program's broker, which CMPI has no function to ask for. Set before the broker is made.
+std::vector<std::string>& servedNameSpaces() {
+  static std::vector<std::string> names;
+  return names;
+}
+
 const CMPIBroker* brokerOf(const void* hdl) noexcept { return static_cast<const CMPIBroker*>(hdl); }
 
 /// The names of a class's instances in the namespace of the endpoints; none if they cannot be read.
@@ -38,8 +41,7 @@ std::vector<ObjectPath> namesOf(const CMPIBroker* broker, const CMPIContext* con
   CMPIEnumeration* found = asked != nullptr ? CBEnumInstanceNames(broker, context, asked, &status) : nullptr;
   while (found != nullptr && CMHasNext(found, &status)) {
     const CMPIData data = CMGetNext(found, &status);
-    const broker::PathObject* path = broker::readPath(*broker::currentArena(), data.value.ref);
-    if (path != nullptr) broker::fillPath(*path, names.emplace_back());
+    if (data.value.ref != nullptr) names.push_back(readPath(data.value.ref));
   }
   return names;
 }
@@ -54,8 +56,8 @@ std::string hostName() {
 InteropWorld worldAt(const CMPIBroker* broker, const CMPIContext* context, const CMPIObjectPath* asked,
                      std::string_view className) {
   InteropWorld world;
-  world.nameSpace = broker::textOf(CMGetNameSpace(asked, nullptr));
-  world.nameSpaces = broker::BrokerCore::of(broker)->registry().nameSpaces();
+  world.nameSpace = readText(CMGetNameSpace(asked, nullptr));
+  world.nameSpaces = servedNameSpaces();
   world.profileNameSpace = schema::sameNamespace(world.nameSpace, kEndpointNameSpace) ? kInterop : world.nameSpace;
   world.hostName = hostName();
   if (util::sameName(className, kProfileClass)) return world;
@@ -65,28 +67,6 @@ InteropWorld worldAt(const CMPIBroker* broker, const CMPIContext* context, const
     world.systems = namesOf(broker, context, "CIM_ComputerSystem");
   }
   return world;
-}
-
-ObjectPath valueOf(const CMPIObjectPath* path) {
-  ObjectPath value;
-  if (const broker::PathObject* object = broker::readPath(*broker::currentArena(), path)) {
-    broker::fillPath(*object, value);
-  }
-  return value;
-}
-
-CMPIObjectPath* objectOf(const ObjectPath& path) {
-  broker::PathObject* object = nullptr;
-  return broker::makePath(*broker::currentArena(), path, false, object).ok() ? object : nullptr;
-}
-
-CMPIInstance* objectOf(const Instance& instance) {
-  broker::Arena& arena = *broker::currentArena();
-  broker::PathObject* path = nullptr;
-  broker::InstanceObject* object = nullptr;
-  broker::Status status = broker::makePath(arena, instance.path, true, path);
-  if (status.ok()) status = broker::makeInstance(arena, *path, instance, object);
-  return status.ok() ? object : nullptr;
 }
 
 CMPIStatus notSupported() { return {CMPI_RC_ERR_NOT_SUPPORTED, nullptr}; }
@@ -100,10 +80,11 @@ CMPIStatus cleanUpInstances(CMPIInstanceMI* mi, const CMPIContext*, CMPIBoolean)
 
 CMPIStatus enumerateNames(CMPIInstanceMI* mi, const CMPIContext* context, const CMPIResult* result,
                           const CMPIObjectPath* asked) {
-  const std::string className = valueOf(asked).className;
-  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked, className);
+  const CMPIBroker* broker = brokerOf(mi->hdl);
+  const std::string className = readPath(asked).className;
+  const InteropWorld world = worldAt(broker, context, asked, className);
   for (const Instance& one : interopInstances(world, className)) {
-    CMReturnObjectPath(result, objectOf(one.path));
+    CMReturnObjectPath(result, makePath(broker, one.path));
   }
   CMReturnDone(result);
   return kOk;
@@ -111,10 +92,11 @@ CMPIStatus enumerateNames(CMPIInstanceMI* mi, const CMPIContext* context, const 
 
 CMPIStatus enumerateInstances(CMPIInstanceMI* mi, const CMPIContext* context, const CMPIResult* result,
                               const CMPIObjectPath* asked, const char**) {
-  const std::string className = valueOf(asked).className;
-  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked, className);
+  const CMPIBroker* broker = brokerOf(mi->hdl);
+  const std::string className = readPath(asked).className;
+  const InteropWorld world = worldAt(broker, context, asked, className);
   for (const Instance& one : interopInstances(world, className)) {
-    CMReturnInstance(result, objectOf(one));
+    CMReturnInstance(result, makeInstance(broker, one));
   }
   CMReturnDone(result);
   return kOk;
@@ -122,10 +104,11 @@ CMPIStatus enumerateInstances(CMPIInstanceMI* mi, const CMPIContext* context, co
 
 CMPIStatus getInstance(CMPIInstanceMI* mi, const CMPIContext* context, const CMPIResult* result,
                        const CMPIObjectPath* asked, const char**) {
-  const ObjectPath path = valueOf(asked);
-  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked, path.className);
+  const CMPIBroker* broker = brokerOf(mi->hdl);
+  const ObjectPath path = readPath(asked);
+  const InteropWorld world = worldAt(broker, context, asked, path.className);
   for (const Instance& one : interopInstances(world, path.className)) {
-    if (sameInstance(one.path, path)) CMReturnInstance(result, objectOf(one));
+    if (sameInstance(one.path, path)) CMReturnInstance(result, makeInstance(broker, one));
   }
   CMReturnDone(result);
   return kOk;
@@ -181,9 +164,9 @@ CMPIStatus associators(CMPIAssociationMI* mi, const CMPIContext* context, const 
                        const char* resultRole, const char**) {
   const CMPIBroker* broker = brokerOf(mi->hdl);
   const InteropWorld world = worldAt(broker, context, asked, association);
-  walk(world, valueOf(asked), association, role, resultRole, [&](const Instance&, const ObjectPath& farEnd) {
+  walk(world, readPath(asked), association, role, resultRole, [&](const Instance&, const ObjectPath& farEnd) {
     CMPIStatus status = kOk;
-    const CMPIInstance* found = CBGetInstance(broker, context, objectOf(farEnd), nullptr, &status);
+    const CMPIInstance* found = CBGetInstance(broker, context, makePath(broker, farEnd), nullptr, &status);
     if (found != nullptr) CMReturnInstance(result, found);  // else it was removed meanwhile
   });
   CMReturnDone(result);
@@ -193,27 +176,30 @@ CMPIStatus associators(CMPIAssociationMI* mi, const CMPIContext* context, const 
 CMPIStatus associatorNames(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
                            const CMPIObjectPath* asked, const char* association, const char*, const char* role,
                            const char* resultRole) {
-  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked, association);
-  walk(world, valueOf(asked), association, role, resultRole,
-       [&](const Instance&, const ObjectPath& farEnd) { CMReturnObjectPath(result, objectOf(farEnd)); });
+  const CMPIBroker* broker = brokerOf(mi->hdl);
+  const InteropWorld world = worldAt(broker, context, asked, association);
+  walk(world, readPath(asked), association, role, resultRole,
+       [&](const Instance&, const ObjectPath& farEnd) { CMReturnObjectPath(result, makePath(broker, farEnd)); });
   CMReturnDone(result);
   return kOk;
 }
 
 CMPIStatus references(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
                       const CMPIObjectPath* asked, const char* association, const char* role, const char**) {
-  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked, association);
-  walk(world, valueOf(asked), association, role, nullptr,
-       [&](const Instance& one, const ObjectPath&) { CMReturnInstance(result, objectOf(one)); });
+  const CMPIBroker* broker = brokerOf(mi->hdl);
+  const InteropWorld world = worldAt(broker, context, asked, association);
+  walk(world, readPath(asked), association, role, nullptr,
+       [&](const Instance& one, const ObjectPath&) { CMReturnInstance(result, makeInstance(broker, one)); });
   CMReturnDone(result);
   return kOk;
 }
 
 CMPIStatus referenceNames(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
                           const CMPIObjectPath* asked, const char* association, const char* role) {
-  const InteropWorld world = worldAt(brokerOf(mi->hdl), context, asked, association);
-  walk(world, valueOf(asked), association, role, nullptr,
-       [&](const Instance& one, const ObjectPath&) { CMReturnObjectPath(result, objectOf(one.path)); });
+  const CMPIBroker* broker = brokerOf(mi->hdl);
+  const InteropWorld world = worldAt(broker, context, asked, association);
+  walk(world, readPath(asked), association, role, nullptr,
+       [&](const Instance& one, const ObjectPath&) { CMReturnObjectPath(result, makePath(broker, one.path)); });
   CMReturnDone(result);
   return kOk;
 }
@@ -238,13 +224,13 @@ CMPIStatus invoke(CMPIMethodMI* mi, const CMPIContext* context, const CMPIResult
   const CMPIBroker* broker = brokerOf(mi->hdl);
   const InteropWorld world = worldAt(broker, context, asked, kConformanceClass);
   const std::vector<Instance> profiles = interopInstances(world, kProfileClass);
-  if (!sameInstance(profiles.front().path, valueOf(asked))) return {CMPI_RC_ERR_NOT_FOUND, nullptr};
+  if (!sameInstance(profiles.front().path, readPath(asked))) return {CMPI_RC_ERR_NOT_FOUND, nullptr};
   CMPIStatus status = kOk;
   const auto count = static_cast<CMPICount>(world.endpoints.size());
   CMPIArray* paths = CMNewArray(broker, count, CMPI_ref, &status);
   for (CMPICount i = 0; i < count; ++i) {
     CMPIValue value;
-    value.ref = objectOf(world.endpoints[i]);
+    value.ref = makePath(broker, world.endpoints[i]);
     CMSetArrayElementAt(paths, i, &value, CMPI_ref);
   }
   CMPIValue value;
@@ -289,6 +275,7 @@ void serveInterop(broker::BrokerOptions& options) {
   }
   options.registry.add(
       {kConformanceClass, kPrefix, "", broker::InstanceMi | broker::AssociationMi, kEndpointNameSpace});
+  servedNameSpaces() = options.registry.nameSpaces();
   options.linked.push_back(linked("InstanceMI", createMi<CMPIInstanceMI, CMPIInstanceMIFT, &instanceTable>));
   options.linked.push_back(
       linked("AssociationMI", createMi<CMPIAssociationMI, CMPIAssociationMIFT, &associationTable>));
