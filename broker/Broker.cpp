@@ -189,47 +189,49 @@ Status Broker::deleteInstance(const ObjectPath& path, const Caller& caller) {
   });
 }
 
+namespace {
+
+/// Opens a request and runs `ask(Request&, source)` in it with the object that `path` names.
+template <typename Ask>
+Status inRequestFrom(BrokerCore& core, const Caller& caller, CMPIFlags flags, const ObjectPath& path, Ask ask) {
+  return inRequest(core, caller, flags, [&](Request& request) {
+    PathObject* source = nullptr;
+    Status status = makeSource(request.arena(), path, CMPI_RC_ERR_INVALID_PARAMETER, source);
+    return status.ok() ? ask(request, *source) : status;
+  });
+}
+
+}  // namespace
+
 Status Broker::associators(const ObjectPath& path, const AssociationFilter& filter, const Selection& selection,
                            const InstanceSink& sink, const Caller& caller) {
-  return inRequest(*core_, caller, flagsOf(selection), [&](Request& request) {
-    PathObject* name = nullptr;
-    const Status status = makeSource(request.arena(), path, CMPI_RC_ERR_INVALID_PARAMETER, name);
-    if (!status.ok()) return status;
-    SinkTaker taker(&sink, nullptr);
-    return request.associated(*name, Form::Instances, farEndOf(filter), listOnly(selection), taker);
+  SinkTaker taker(&sink, nullptr);
+  return inRequestFrom(*core_, caller, flagsOf(selection), path, [&](Request& request, const PathObject& source) {
+    return request.associated(source, Form::Instances, farEndOf(filter), listOnly(selection), taker);
   });
 }
 
 Status Broker::associatorNames(const ObjectPath& path, const AssociationFilter& filter, const PathSink& sink,
                                const Caller& caller) {
-  return inRequest(*core_, caller, 0, [&](Request& request) {
-    PathObject* name = nullptr;
-    const Status status = makeSource(request.arena(), path, CMPI_RC_ERR_INVALID_PARAMETER, name);
-    if (!status.ok()) return status;
-    SinkTaker taker(nullptr, &sink);
-    return request.associated(*name, Form::Paths, farEndOf(filter), Shape(), taker);
+  SinkTaker taker(nullptr, &sink);
+  return inRequestFrom(*core_, caller, 0, path, [&](Request& request, const PathObject& source) {
+    return request.associated(source, Form::Paths, farEndOf(filter), Shape(), taker);
   });
 }
 
 Status Broker::references(const ObjectPath& path, const AssociationFilter& filter, const Selection& selection,
                           const InstanceSink& sink, const Caller& caller) {
-  return inRequest(*core_, caller, flagsOf(selection), [&](Request& request) {
-    PathObject* name = nullptr;
-    const Status status = makeSource(request.arena(), path, CMPI_RC_ERR_INVALID_PARAMETER, name);
-    if (!status.ok()) return status;
-    SinkTaker taker(&sink, nullptr);
-    return request.referring(*name, Form::Instances, farEndOf(filter), listOnly(selection), taker);
+  SinkTaker taker(&sink, nullptr);
+  return inRequestFrom(*core_, caller, flagsOf(selection), path, [&](Request& request, const PathObject& source) {
+    return request.referring(source, Form::Instances, farEndOf(filter), listOnly(selection), taker);
   });
 }
 
 Status Broker::referenceNames(const ObjectPath& path, const AssociationFilter& filter, const PathSink& sink,
                               const Caller& caller) {
-  return inRequest(*core_, caller, 0, [&](Request& request) {
-    PathObject* name = nullptr;
-    const Status status = makeSource(request.arena(), path, CMPI_RC_ERR_INVALID_PARAMETER, name);
-    if (!status.ok()) return status;
-    SinkTaker taker(nullptr, &sink);
-    return request.referring(*name, Form::Paths, farEndOf(filter), Shape(), taker);
+  SinkTaker taker(nullptr, &sink);
+  return inRequestFrom(*core_, caller, 0, path, [&](Request& request, const PathObject& source) {
+    return request.referring(source, Form::Paths, farEndOf(filter), Shape(), taker);
   });
 }
 
