@@ -156,7 +156,7 @@ TEST_F(DNSSettingDataObjectsTest, AServerWhoseStringFailsLeavesItsElementUnset) 
   }
 }
 
-TEST_F(DNSSettingDataObjectsTest, WhatTheInstanceRefusesStaysUnset) {
+TEST_F(DNSSettingDataObjectsTest, APropertyThatTheInstanceRefusesStaysUnset) {
   broker_.failEach("setProperty", Mode::SetRc);
   EXPECT_THAT(made().names(), IsEmpty());
   EXPECT_EQ(kAllProperties.size(), broker_.callsOf("setProperty"));

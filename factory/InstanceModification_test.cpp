@@ -98,7 +98,7 @@ TEST_F(InstanceModification, OfTheSettingDataSaysWhatWasRefusedByItsNumberAndLea
   EXPECT_THAT(logger_.pairs().errors(), IsEmpty());
 }
 
-TEST_F(InstanceModification, OfTheGeneralDataFailsWhereNeitherPropertyIsThere) {
+TEST_F(InstanceModification, OfTheGeneralDataFailsIfNeitherPropertyIsThere) {
   EXPECT_EQ(1U, modifyGeneral(general_));
   EXPECT_EQ(1U, modifyGeneral(general_.with("DNSSuffixesToAppend", "no array")));
   EXPECT_EQ(0U, modifyGeneral(general_.with("DNSSuffixesToAppend", texts({"a"}))));

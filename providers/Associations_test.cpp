@@ -1,4 +1,4 @@
-// What all eight associations have in common: whom they let a request lead to, and what of a request they do not read.
+// Common to all eight associations: where a request may lead, and which parts of a request they ignore.
 
 #include <algorithm>
 #include <cctype>
@@ -79,7 +79,7 @@ TEST_P(EveryAssociation, KnowsTheClassOfASourceByItsExactName) {
   }
 }
 
-TEST_P(EveryAssociation, KnowsTheAssociationClassByItsExactNameAndTakesItsOwnWhereNoneIsGiven) {
+TEST_P(EveryAssociation, KnowsTheAssociationClassByItsExactNameAndTakesItsOwnIfNoneIsGiven) {
   const std::string own = under.className;
   for (const std::string& name : {lowerCase(own), "CIM_" + own.substr(6), std::string()}) {
     EXPECT_THAT(associated(under.left, {.assocClass = name.c_str()}), IsEmpty()) << name;

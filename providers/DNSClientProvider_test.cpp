@@ -1,4 +1,4 @@
-// What a client reads of the endpoints.
+// The endpoints as a client reads them.
 
 #include "providers/testing/InstanceTest.h"
 

@@ -1,4 +1,4 @@
-// What a client reads of the host's general setting.
+// The host's general setting as a client reads it.
 
 #include "providers/testing/InstanceTest.h"
 

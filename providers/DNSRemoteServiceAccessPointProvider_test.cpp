@@ -1,4 +1,4 @@
-// What a client reads of the servers.
+// The servers as a client reads them.
 
 #include "providers/testing/InstanceTest.h"
 

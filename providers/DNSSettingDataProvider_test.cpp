@@ -102,7 +102,7 @@ TEST_F(Settings, ComeInTheOrderOfTheTree) {
   EXPECT_THAT(ids, ElementsAre("BMC%bmc0", "Computer%eth1", "Computer%eth0"));
 }
 
-TEST_F(Settings, FileWithoutServersLeavesThemOutAlsoWhereTheNodeHasThem) {
+TEST_F(Settings, FileWithoutServersLeavesThemOutEvenIfTheNodeHasThem) {
   world.nic("eth0", usualNic()).install().file("eth0", "DNSSERVERS=\n");
   EXPECT_FALSE(instances().at(0).has("DNSServerAddresses"));
 }

@@ -1,4 +1,4 @@
-// What all twelve providers have alike: create functions, function tables, and the operations that do no work.
+// Common to all twelve providers: create functions, function tables, and the operations that do no work.
 
 #include <set>
 
@@ -45,7 +45,7 @@ TEST_P(EveryProvider, LeavesTheStatusOfItsCreationUntouched) {
   EXPECT_EQ(before, status.msg);
 }
 
-TEST_P(EveryProvider, HandsOutOneTableForEver) {
+TEST_P(EveryProvider, AlwaysReturnsTheSameTable) {
   CMPIInstanceMI* const mi = GetParam().createInstanceMI(broker.cmpi(), nullptr, nullptr);
   EXPECT_EQ(nullptr, mi->hdl);
   EXPECT_EQ(200, mi->ft->ftVersion);
@@ -168,7 +168,7 @@ TEST_P(EveryAssociationProvider, NullPathResultOrBrokerNeverEndsTheProcess) {
   }
 }
 
-TEST_P(EveryAssociationProvider, HandsOutItsTable) {
+TEST_P(EveryAssociationProvider, ReturnsItsTable) {
   CMPIStatus status{CMPI_RC_ERR_FAILED, nullptr};
   CMPIAssociationMI* const mi = GetParam().createAssociationMI(broker.cmpi(), nullptr, &status);
   EXPECT_EQ(CMPI_RC_ERR_FAILED, status.rc);

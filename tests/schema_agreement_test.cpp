@@ -1,5 +1,5 @@
-// What the providers really set, held against the classes that they publish: a property that a class lacks, or has with
-// another type, would be refused by the broker and lost on its way to the client.
+// Compares what the providers set with the classes that they publish. A property that a class lacks, or has with
+// another type, would be refused by the broker and never reach the client.
 
 #include <gtest/gtest.h>
 

@@ -1,6 +1,6 @@
 #pragma once
 
-// What the tests of the objects of the two setting classes share.
+// Shared by the tests of the objects of the two setting classes.
 
 #include <memory>
 #include <string>

@@ -1,7 +1,7 @@
 #pragma once
 
-// The association providers, asked for what belongs together. The order of their calls, their log lines and how they
-// end are told in tests/conformance/.
+// The association providers: which objects belong together. tests/conformance/ has the order of their calls, their log
+// lines and how they end.
 
 #include <string>
 #include <vector>
@@ -16,7 +16,7 @@ namespace ZV::Test {
 
 using Names = std::vector<std::string>;
 
-/// What tells an object from its siblings: its Name or InstanceID, or its class where it has no keys.
+/// The text that identifies an object: its Name or InstanceID, or its class if it has no keys.
 inline std::string nameOf(const Path& path) {
   if (path.keys.empty()) return path.className;
   return (path["InstanceID"].isNull() ? path["Name"] : path["InstanceID"]).text();
@@ -55,7 +55,7 @@ class AssociationTest : public ::testing::Test {
   /// The pairs that EnumInstances and EnumInstanceNames give.
   Names built() { return pairsIn(instances.enumerateInstances(associationClass())); }
   Names named() { return pairsIn(instances.enumerateInstanceNames(associationClass())); }
-  /// Both, where they agree.
+  /// Both, if they agree.
   Names enumerated() {
     const Names all = built();
     EXPECT_EQ(all, named());

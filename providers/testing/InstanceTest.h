@@ -23,7 +23,7 @@ class InstanceTest : public ::testing::Test {
     return provider.enumerateInstances(classPath(), properties).instances();
   }
   std::vector<Path> paths() { return provider.enumerateInstanceNames(classPath()).paths(); }
-  /// What GetInstance gives: one instance or none.
+  /// The result of GetInstance: one instance or none.
   std::vector<Instance> found(const Path& path, const PropertyList& properties = nullptr) {
     return provider.getInstance(path, properties).instances();
   }

@@ -6,7 +6,7 @@
 
 namespace ZV::Test {
 
-/// A modification closes its result and marks no exit, also where it failed with a code of its own.
+/// A modification closes its result and logs no exit, even if it failed with its own code.
 inline void expectDoneWithoutExit(const Outcome& outcome) {
   EXPECT_TRUE(outcome.markedEntry());
   EXPECT_EQ(1U, outcome.calls.count("returnDone"));

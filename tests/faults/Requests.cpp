@@ -5,7 +5,7 @@
 namespace ZV::Test {
 namespace {
 
-// What a modification asks for; without properties where the class refuses it.
+// The changes of a modification; without properties if the class refuses it.
 Instance changeOf(const Provider& provider) {
   const Instance none(provider.className);
   const Value suffixes = texts({"new.example.org", "more.example.org"});

@@ -43,8 +43,8 @@ struct Provider {
   const char* stem;    ///< of its operations' names
   const char* source;  ///< its file, without folder and ending
   InstanceProvider::Create createInstanceMI;
-  AssociationProvider::Create createAssociationMI;  ///< null where it has none
-  MethodProvider::Create createMethodMI;            ///< null where it has none
+  AssociationProvider::Create createAssociationMI;  ///< null if it has none
+  MethodProvider::Create createMethodMI;            ///< null if it has none
   /// Of an association: its two references in the order in which they are set, and an object of each end on a host with
   /// the interface eth0 and the server 192.0.2.53. Of the others: an object of the class on that host.
   Path left;
@@ -122,7 +122,7 @@ inline const std::vector<Provider>& allProviders() {
   return all;
 }
 
-/// The provider with that prefix; null where there is none.
+/// The provider with that prefix; null if there is none.
 inline const Provider* findProvider(std::string_view prefix) {
   for (const Provider& provider : allProviders()) {
     if (prefix == provider.prefix) return &provider;
