@@ -224,7 +224,7 @@ TEST_F(ObjectsTest, ACopyOfAPathIsItsOwn) {
   EXPECT_EQ(shown(farEnd), "root/cimv2:T_Thing.Name=\"of the name\"");
 }
 
-TEST_F(ObjectsTest, AnEmbeddedInstanceFitsIfItIsDeclared) {
+TEST_F(ObjectsTest, AnEmbeddedInstanceFitsWhereItIsDeclared) {
   CMPIInstance* inner = instance();
   set(inner, "Name", "inner");
   CMPIInstance* outer = instance();
