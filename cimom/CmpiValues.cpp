@@ -1,6 +1,6 @@
 #include "cimom/CmpiValues.h"
 
-#include "cmpimacs.h"
+#include <cmpimacs.h>
 
 namespace zorva::cimom {
 

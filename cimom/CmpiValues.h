@@ -1,11 +1,12 @@
 #pragma once
 
-#include "broker/objects/Value.h"
-#include "cmpidt.h"
-#include "cmpift.h"
-
 // Plain values as CMPI objects and back, by CMPI alone: what a provider that is part of the program needs. The objects
 // belong to the request in which they are made.
+
+#include <cmpidt.h>
+#include <cmpift.h>
+
+#include "broker/objects/Value.h"
 
 namespace zorva::cimom {
 
