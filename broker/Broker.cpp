@@ -322,10 +322,11 @@ const ProviderRegistry& Broker::registry() const noexcept { return core_->regist
 Status Broker::canonicalPath(const ObjectPath& path, ObjectPath& canonical) const {
   return inRequest(*core_, {}, 0, [&](Request& request) {
     PathObject* name = nullptr;
-    PathObject* resolved = nullptr;
     Status status = makePath(request.arena(), path, true, name);
-    if (status.ok()) status = request.resolve(*name, resolved);
-    if (status.ok()) fillPath(*resolved, canonical);
+    if (!status.ok()) return status;
+    const Expected<PathObject*, Status> resolved = request.resolve(*name);
+    if (!resolved) return resolved.error();
+    fillPath(**resolved, canonical);
     return status;
   });
 }

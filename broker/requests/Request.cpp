@@ -90,21 +90,21 @@ Status Request::claim(Access access, std::string_view className, const ObjectPat
   }
 }
 
-Status Request::resolve(const PathObject& path, PathObject*& resolved) {
-  Status status = tooDeep();
-  if (!status.ok()) return status;
+Expected<PathObject*, Status> Request::resolve(const PathObject& path) {
+  if (Status status = tooDeep(); !status.ok()) return unexpected(std::move(status));
   const ProviderRegistry& registry = core_.registry();
   const std::string_view nameSpace =
       path.nameSpace->length == 0 ? registry.defaultNameSpace() : registry.nameSpace(path.nameSpace->view());
   if (nameSpace.empty()) {
-    return failure(CMPI_RC_ERR_INVALID_NAMESPACE, "there is no namespace " + quoted(path.nameSpace->view()));
+    return unexpected(
+        failure(CMPI_RC_ERR_INVALID_NAMESPACE, "there is no namespace " + quoted(path.nameSpace->view())));
   }
   if (path.info == nullptr) {
-    return failure(CMPI_RC_ERR_INVALID_CLASS, "there is no class " + quoted(path.className->view()));
+    return unexpected(failure(CMPI_RC_ERR_INVALID_CLASS, "there is no class " + quoted(path.className->view())));
   }
-  resolved = copyPath(arena(), path);
+  PathObject* resolved = copyPath(arena(), path);
   resolved->setNameSpace(nameSpace);
-  return {};
+  return resolved;
 }
 
 const ProviderEntry* Request::entryOf(const PathObject& path, const ClassInfo& info, MiKind kind) const {
@@ -198,9 +198,9 @@ Status Request::enumerateOne(const PathObject& path, const ClassInfo& info, Form
 }
 
 Status Request::enumerate(const PathObject& path, Form form, const Shape& shape, Taker& taker) {
-  PathObject* resolved = nullptr;
-  Status status = resolve(path, resolved);
-  if (!status.ok()) return status;
+  const Expected<PathObject*, Status> found = resolve(path);
+  if (!found) return found.error();
+  PathObject* resolved = *found;
   const ClassInfo& info = *resolved->info;
   const std::vector<const ClassInfo*> served = servedBelow(*resolved, info);
   if (served.empty()) {
@@ -211,7 +211,7 @@ Status Request::enumerate(const PathObject& path, Form form, const Shape& shape,
   for (const ClassInfo* one : served) {
     const MarkGuard guard(scope_);
     bool unavailable = false;
-    status = enumerateOne(*resolved, *one, form, shape, filter, unavailable);
+    Status status = enumerateOne(*resolved, *one, form, shape, filter, unavailable);
     const bool passedOver = one != &info && (unavailable || status.rc == CMPI_RC_ERR_NOT_SUPPORTED);
     if (passedOver && unavailable) core_.log(LogLevel::Warning, one->name() + " is left out: " + status.message);
     outcome.add(std::move(status), passedOver);
@@ -245,37 +245,35 @@ class FirstTaker : public Taker {
 
 }  // namespace
 
-Status Request::findInstanceMi(const PathObject& path, std::string_view operation, PathObject*& resolved,
-                               const ProviderEntry*& entry, const CMPIInstanceMI*& mi) {
-  Status status = resolve(path, resolved);
-  if (!status.ok()) return status;
-  entry = entryOf(*resolved, *resolved->info, InstanceMi);
+Expected<Request::Target, Status> Request::findInstanceMi(const PathObject& resolved, std::string_view operation) {
+  const ProviderEntry* entry = entryOf(resolved, *resolved.info, InstanceMi);
   if (entry == nullptr) {
-    return failure(CMPI_RC_ERR_NOT_SUPPORTED, "no provider serves " + resolved->info->name() + ", so " +
-                                                  std::string(operation) + " cannot be done");
+    return unexpected(failure(CMPI_RC_ERR_NOT_SUPPORTED, "no provider serves " + resolved.info->name() + ", so " +
+                                                             std::string(operation) + " cannot be done"));
   }
-  mi = core_.loader().instanceMi(*entry, status);
-  return status;
+  Status status;
+  const CMPIInstanceMI* mi = core_.loader().instanceMi(*entry, status);
+  if (!status.ok()) return unexpected(std::move(status));
+  return Target{entry, const_cast<CMPIInstanceMI*>(mi)};
 }
 
 Status Request::get(const PathObject& path, const Shape& shape, Taker& taker) {
-  PathObject* resolved = nullptr;
-  const ProviderEntry* entry = nullptr;
-  const CMPIInstanceMI* mi = nullptr;
-  Status status = findInstanceMi(path, "GetInstance", resolved, entry, mi);
-  if (status.rc == CMPI_RC_ERR_NOT_SUPPORTED && resolved != nullptr &&
-      !servedBelow(*resolved, *resolved->info).empty()) {
+  const Expected<PathObject*, Status> found = resolve(path);
+  if (!found) return found.error();
+  PathObject* resolved = *found;
+  const Expected<Target, Status> target = findInstanceMi(*resolved, "GetInstance");
+  if (!target && target.error().rc == CMPI_RC_ERR_NOT_SUPPORTED && !servedBelow(*resolved, *resolved->info).empty()) {
     // The class in an instance's name is the class that it was made of, never a superclass.
     return failure(CMPI_RC_ERR_NOT_FOUND, "no instance has " + resolved->info->name() + " itself as its class");
   }
-  if (!status.ok()) return status;
+  if (!target) return target.error();
+  const auto [entry, mi] = *target;
   FirstTaker first(taker);
   ResultFilter filter(core_, scope_, shape, resolved->info, resolved->nameSpace->view(), first);
   filter.within = resolved->info;
   ResultObject result(core_, ResultObject::Instances, &filter, entry->prefix);
   const char** list = providerList(shape, {resolved->info});
-  status = call(result, *entry, "GetInstance", mi->ft->getInstance, const_cast<CMPIInstanceMI*>(mi), &context_, &result,
-                resolved, list);
+  Status status = call(result, *entry, "GetInstance", mi->ft->getInstance, mi, &context_, &result, resolved, list);
   if (status.ok() && !first.found()) {
     ObjectPath named;
     fillPath(*resolved, named);
@@ -285,19 +283,20 @@ Status Request::get(const PathObject& path, const Shape& shape, Taker& taker) {
 }
 
 Status Request::create(const PathObject& path, const InstanceObject& instance, Taker& taker) {
-  PathObject* resolved = nullptr;
-  const ProviderEntry* entry = nullptr;
-  const CMPIInstanceMI* mi = nullptr;
-  Status status = findInstanceMi(path, "CreateInstance", resolved, entry, mi);
-  if (!status.ok()) return status;
+  const Expected<PathObject*, Status> found = resolve(path);
+  if (!found) return found.error();
+  PathObject* resolved = *found;
+  const Expected<Target, Status> target = findInstanceMi(*resolved, "CreateInstance");
+  if (!target) return target.error();
+  const auto [entry, mi] = *target;
   InstanceObject* given = copyInstance(arena(), instance);
   given->nameSpace = resolved->nameSpace;
   FirstTaker first(taker);
   const Shape all;
   ResultFilter filter(core_, scope_, all, nullptr, resolved->nameSpace->view(), first);
   ResultObject result(core_, ResultObject::Paths, &filter, entry->prefix);
-  status = call(result, *entry, "CreateInstance", mi->ft->createInstance, const_cast<CMPIInstanceMI*>(mi), &context_,
-                &result, resolved, given);
+  Status status =
+      call(result, *entry, "CreateInstance", mi->ft->createInstance, mi, &context_, &result, resolved, given);
   // If a provider returns no name, it made the given instance under the given name.
   if (status.ok() && !first.found()) taker.takePath(*given->path(arena()));
   return status;
@@ -334,13 +333,14 @@ void listChanges(const Modification& modification, std::vector<Property>& change
 
 Status Request::modify(const PathObject& path, const InstanceObject& instance, const Shape& shape,
                        std::vector<Property>* changes) {
-  PathObject* resolved = nullptr;
-  const ProviderEntry* entry = nullptr;
-  const CMPIInstanceMI* mi = nullptr;
-  Status status = findInstanceMi(path, "ModifyInstance", resolved, entry, mi);
-  if (!status.ok()) return status;
+  const Expected<PathObject*, Status> found = resolve(path);
+  if (!found) return found.error();
+  PathObject* resolved = *found;
+  const Expected<Target, Status> target = findInstanceMi(*resolved, "ModifyInstance");
+  if (!target) return target.error();
+  const auto [entry, mi] = *target;
   CurrentTaker taker(arena());
-  status = get(*resolved, Shape(), taker);
+  Status status = get(*resolved, Shape(), taker);
   // If the provider cannot be read, it gets the instance as the client gave it.
   if (!status.ok() && status.rc != CMPI_RC_ERR_NOT_SUPPORTED) return status;
   Modification modification;
@@ -349,19 +349,19 @@ Status Request::modify(const PathObject& path, const InstanceObject& instance, c
   if (changes != nullptr) listChanges(modification, *changes);
   const char** list = providerList(shape, {resolved->info});
   ResultObject result(core_, ResultObject::Nothing, nullptr, entry->prefix);
-  return call(result, *entry, "ModifyInstance", mi->ft->modifyInstance, const_cast<CMPIInstanceMI*>(mi), &context_,
-              &result, resolved, modification.handed, list);
+  return call(result, *entry, "ModifyInstance", mi->ft->modifyInstance, mi, &context_, &result, resolved,
+              modification.handed, list);
 }
 
 Status Request::remove(const PathObject& path) {
-  PathObject* resolved = nullptr;
-  const ProviderEntry* entry = nullptr;
-  const CMPIInstanceMI* mi = nullptr;
-  Status status = findInstanceMi(path, "DeleteInstance", resolved, entry, mi);
-  if (!status.ok()) return status;
+  const Expected<PathObject*, Status> found = resolve(path);
+  if (!found) return found.error();
+  PathObject* resolved = *found;
+  const Expected<Target, Status> target = findInstanceMi(*resolved, "DeleteInstance");
+  if (!target) return target.error();
+  const auto [entry, mi] = *target;
   ResultObject result(core_, ResultObject::Nothing, nullptr, entry->prefix);
-  return call(result, *entry, "DeleteInstance", mi->ft->deleteInstance, const_cast<CMPIInstanceMI*>(mi), &context_,
-              &result, resolved);
+  return call(result, *entry, "DeleteInstance", mi->ft->deleteInstance, mi, &context_, &result, resolved);
 }
 
 namespace {
@@ -445,12 +445,12 @@ Status Request::askEach(const std::vector<Association>& associations, const Resu
 }
 
 Status Request::associated(const PathObject& path, Form form, const FarEnd& filter, const Shape& shape, Taker& taker) {
-  PathObject* resolved = nullptr;
-  Status status = resolve(path, resolved);
-  if (!status.ok()) return status;
+  const Expected<PathObject*, Status> found = resolve(path);
+  if (!found) return found.error();
+  PathObject* resolved = *found;
   std::vector<Association> associations;
   const ClassInfo* resultClass = nullptr;
-  status = findAssociations(*resolved, filter, true, associations, resultClass);
+  Status status = findAssociations(*resolved, filter, true, associations, resultClass);
   if (!status.ok()) return status;
   ResultFilter results(core_, scope_, shape, nullptr, resolved->nameSpace->view(), taker);
   results.within = resultClass;
@@ -472,12 +472,12 @@ Status Request::associated(const PathObject& path, Form form, const FarEnd& filt
 }
 
 Status Request::referring(const PathObject& path, Form form, const FarEnd& filter, const Shape& shape, Taker& taker) {
-  PathObject* resolved = nullptr;
-  Status status = resolve(path, resolved);
-  if (!status.ok()) return status;
+  const Expected<PathObject*, Status> found = resolve(path);
+  if (!found) return found.error();
+  PathObject* resolved = *found;
   std::vector<Association> associations;
   const ClassInfo* unused = nullptr;
-  status = findAssociations(*resolved, filter, false, associations, unused);
+  Status status = findAssociations(*resolved, filter, false, associations, unused);
   if (!status.ok()) return status;
   ResultFilter results(core_, scope_, shape, nullptr, resolved->nameSpace->view(), taker);
   // Not the class that the provider is asked for: a provider may name its associations by the class of a sibling
@@ -542,9 +542,9 @@ Status checkedArguments(const schema::ClassMethod& method, const EntryList& inpu
 
 Status Request::invoke(const PathObject& path, std::string_view method, const EntryList& input, CMPIData& value,
                        EntryList& output) {
-  PathObject* resolved = nullptr;
-  Status status = resolve(path, resolved);
-  if (!status.ok()) return status;
+  const Expected<PathObject*, Status> found = resolve(path);
+  if (!found) return found.error();
+  PathObject* resolved = *found;
   const schema::ClassMethod* declared = resolved->info->declared().findMethod(method);
   if (declared == nullptr) {
     return failure(CMPI_RC_ERR_METHOD_NOT_FOUND, resolved->info->name() + " has no method " + quoted(method));
@@ -555,7 +555,7 @@ Status Request::invoke(const PathObject& path, std::string_view method, const En
   }
   auto* in = arena().make<ArgsObject>(arena());
   auto* out = arena().make<ArgsObject>(arena());
-  status = checkedArguments(*declared, input, *in);
+  Status status = checkedArguments(*declared, input, *in);
   const CMPIMethodMI* mi = status.ok() ? core_.loader().methodMi(*entry, status) : nullptr;
   if (mi == nullptr) return status;
   value = nullData(cmpiType(declared->returnType, false));

@@ -14,6 +14,7 @@
 #include "broker/requests/HeldClaim.h"
 #include "broker/requests/Result.h"
 #include "broker/requests/ResultFilter.h"
+#include "util/Expected.h"
 
 namespace zorva::broker {
 
@@ -58,10 +59,14 @@ class Request {
                 EntryList& output);
 
   /// `path` with the class `info` and the namespace as the registry spells it; a failure if either is unknown.
-  Status resolve(const PathObject& path, PathObject*& resolved);
+  Expected<PathObject*, Status> resolve(const PathObject& path);
 
  private:
   struct Association;
+  struct Target {
+    const ProviderEntry* entry;
+    CMPIInstanceMI* mi;
+  };
 
   Status tooDeep() const;
   const ProviderEntry* entryOf(const PathObject& path, const ClassInfo& info, MiKind kind) const;
@@ -78,8 +83,8 @@ class Request {
   Status askEach(const std::vector<Association>& associations, const ResultFilter& results, Ask&& ask);
   Status enumerateOne(const PathObject& path, const ClassInfo& info, Form form, const Shape& shape,
                       ResultFilter& filter, bool& unavailable);
-  Status findInstanceMi(const PathObject& path, std::string_view operation, PathObject*& resolved,
-                        const ProviderEntry*& entry, const CMPIInstanceMI*& mi);
+  /// The provider of the instances of a path that resolve() returned. `operation` is for the text of a failure.
+  Expected<Target, Status> findInstanceMi(const PathObject& resolved, std::string_view operation);
 
   BrokerCore& core_;
   Scope scope_;

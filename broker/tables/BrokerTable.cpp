@@ -308,15 +308,16 @@ CMPIStatus setProperty(const CMPIBroker* broker, const CMPIContext* context, con
   {
     UpCall call(broker, context, path);
     if (!call.good()) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
-    PathObject* resolved = nullptr;
-    result = call.request().resolve(call.path(), resolved);
-    if (result.ok()) {
-      InstanceObject* instance = InstanceObject::make(call.request().arena(), *resolved);
+    const Expected<PathObject*, Status> resolved = call.request().resolve(call.path());
+    if (!resolved) {
+      result = resolved.error();
+    } else {
+      InstanceObject* instance = InstanceObject::make(call.request().arena(), **resolved);
       const CMPIStatus set = instance->ft->setProperty(instance, name, value, type);
       result = {set.rc, std::string(textOf(set.msg))};
       Shape shape;
       shape.properties.emplace().push_back(orEmpty(name));
-      if (result.ok()) result = call.request().modify(*resolved, *instance, shape);
+      if (result.ok()) result = call.request().modify(**resolved, *instance, shape);
     }
   }
   return statusOf(static_cast<CMPIrc>(result.rc), result.message);

@@ -202,6 +202,7 @@ CMPIString* messageOf(const CMPIBroker* broker, const char* pattern, CMPIStatus*
 }
 
 // There are no translations: every message has its default text.
+// NOLINTNEXTLINE(cert-dcl50-cpp): the standard's signature
 CMPIString* getMessage(const CMPIBroker* broker, const char* /*id*/, const char* defaultText, CMPIStatus* status,
                        CMPICount count, ...) {
   va_list arguments;
@@ -211,8 +212,9 @@ CMPIString* getMessage(const CMPIBroker* broker, const char* /*id*/, const char*
   return message;
 }
 
-CMPIString* getMessage2(const CMPIBroker* broker, const char* /*id*/, const CMPIMsgFileHandle file,
-                        const char* defaultText, CMPIStatus* status, CMPICount count, ...) {
+// NOLINTNEXTLINE(cert-dcl50-cpp): the standard's signature
+CMPIString* getMessage2(const CMPIBroker* broker, const char* /*id*/, CMPIMsgFileHandle file, const char* defaultText,
+                        CMPIStatus* status, CMPICount count, ...) {
   // openMessageFile returns only null handles.
   if (file != nullptr) return badHandle<CMPIString*>(status);
   va_list arguments;
@@ -228,7 +230,7 @@ CMPIStatus openMessageFile(const CMPIBroker* broker, const char* name, CMPIMsgFi
   return {name != nullptr && file != nullptr ? CMPI_RC_OK : CMPI_RC_ERR_INVALID_PARAMETER, nullptr};
 }
 
-CMPIStatus closeMessageFile(const CMPIBroker* broker, const CMPIMsgFileHandle file) {
+CMPIStatus closeMessageFile(const CMPIBroker* broker, CMPIMsgFileHandle file) {
   const bool good = BrokerCore::of(broker) != nullptr && file == nullptr;
   return {good ? CMPI_RC_OK : CMPI_RC_ERR_INVALID_HANDLE, nullptr};
 }
