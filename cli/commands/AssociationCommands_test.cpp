@@ -1,26 +1,17 @@
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
-#include <nlohmann/json.hpp>
-
 #include "cli/testing/Running.h"
 
 namespace zorva::cli {
 namespace {
 
-using nlohmann::json;
-
-constexpr const char* kEth0 = R"(ZORVA_DNSProtocolEndPoint.Name="eth0")";
-
 TEST(Associators, AreThoseOfTheResultClass) {
-  const json found = jsonShown(TestHost(), {"ai", kEth0, "--result-class", "CIM_RemoteServiceAccessPoint"});
+  const json found = jsonShown(TestHost(), {"ai", kEndpoint, "--result-class", "CIM_RemoteServiceAccessPoint"});
   ASSERT_EQ(found.size(), 2U);
   EXPECT_EQ(found[0]["properties"]["Name"], "192.0.2.53");
 }
 
 TEST(Associators, AreThoseThroughTheAssociationAndTheRoles) {
   const auto count = [](const Words& filter) {
-    Words words{"ain", kEth0};
+    Words words{"ain", kEndpoint};
     words.insert(words.end(), filter.begin(), filter.end());
     return jsonShown(TestHost(), words).size();
   };
@@ -31,13 +22,13 @@ TEST(Associators, AreThoseThroughTheAssociationAndTheRoles) {
 }
 
 TEST(Associators, RefuseAClassThatIsNot) {
-  expectRefused(TestHost(), {"ai", kEth0, "--result-class", "CIM_Nothing"}, 2, "there is no class CIM_Nothing");
-  expectRefused(TestHost(), {"ri", kEth0, "--result-class", "CIM_Nothing"}, 2, "there is no class CIM_Nothing");
+  expectRefused(TestHost(), {"ai", kEndpoint, "--result-class", "CIM_Nothing"}, 2, "there is no class CIM_Nothing");
+  expectRefused(TestHost(), {"ri", kEndpoint, "--result-class", "CIM_Nothing"}, 2, "there is no class CIM_Nothing");
 }
 
 TEST(Associators, RefuseWhatNoAssociationCanMean) {
   const TestHost host;
-  expectRefused(host, {"ai", kEth0, "--assoc-class", "ZORVA_DNSSettingData"}, 2,
+  expectRefused(host, {"ai", kEndpoint, "--assoc-class", "ZORVA_DNSSettingData"}, 2,
                 "ZORVA_DNSSettingData is no association");
   expectRefused(host, {"ain", "ZORVA_DNSGeneralSettingData", "--assoc-class", "ZORVA_RemoteAccessAvailableToElement"},
                 2,
@@ -45,9 +36,9 @@ TEST(Associators, RefuseWhatNoAssociationCanMean) {
                 "zorvactl: its ends are Antecedent (ZORVA_RemoteServiceAccessPoint) and Dependent (");
   expectRefused(host, {"ri", R"(ZORVA_DNSHostedAccessPoint.Dependent="ZORVA_DNSProtocolEndPoint.Name=\"eth0\"")"}, 2,
                 "ZORVA_DNSHostedAccessPoint is at no end of any association");
-  expectRefused(host, {"rin", kEth0, "--role", "fr\x1Bob"}, 2,
+  expectRefused(host, {"rin", kEndpoint, "--role", "fr\x1Bob"}, 2,
                 "--role: no association that is meant has a reference fr\\x1Bob\nzorvactl: there are ");
-  expectRefused(host, {"ain", kEth0, "--result-role", "Nobody"}, 2, "--result-role: no association");
+  expectRefused(host, {"ain", kEndpoint, "--result-role", "Nobody"}, 2, "--result-role: no association");
 }
 
 TEST(Associators, WantASourceThatIsClear) {
@@ -58,7 +49,7 @@ TEST(Associators, WantASourceThatIsClear) {
 TEST(References, AreTheAssociationsThemselves) {
   const json names = jsonShown(TestHost(), {"rin", R"(ZORVA_RemoteServiceAccessPoint.Name="192.0.2.53")"});
   EXPECT_EQ(names.size(), 2U);
-  const json found = jsonShown(TestHost(), {"ri", kEth0, "--result-class", "ZORVA_DNSHostedAccessPoint"});
+  const json found = jsonShown(TestHost(), {"ri", kEndpoint, "--result-class", "ZORVA_DNSHostedAccessPoint"});
   ASSERT_EQ(found.size(), 1U);
   EXPECT_EQ(found[0]["class"], "ZORVA_DNSHostedAccessPoint");
 }

@@ -1,24 +1,11 @@
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
 #include <sys/stat.h>
 
 #include <filesystem>
-#include <nlohmann/json.hpp>
 
 #include "cli/testing/Running.h"
 
 namespace zorva::cli {
 namespace {
-
-using nlohmann::json;
-using testing::AllOf;
-using testing::HasSubstr;
-using testing::Not;
-using testing::StartsWith;
-
-constexpr const char* kSetting = R"(ZORVA_DNSSettingData.InstanceID="Computer%eth0")";
-constexpr const char* kGeneral = "ZORVA_DNSGeneralSettingData";
-constexpr const char* kEndpoint = R"(ZORVA_DNSProtocolEndPoint.Name="eth0")";
 
 TEST_F(Changing, ModifyChangesOneSettingAndLeavesTheOthers) {
   host_.directory().write("data/ifcfg-eth0", wholeFileWith("CONFIG_NAME=", "CONFIG_NAME=office"));

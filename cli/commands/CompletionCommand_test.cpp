@@ -1,17 +1,7 @@
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
-#include <nlohmann/json.hpp>
-
 #include "cli/testing/Running.h"
 
 namespace zorva::cli {
 namespace {
-
-using nlohmann::json;
-using testing::HasSubstr;
-using testing::StartsWith;
-using zorva::agent::testing::contentsOf;
 
 TEST(CompletionScript, AsksTheProgramForClassesAndInterfaces) {
   const TestHost host;

@@ -1,15 +1,7 @@
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
-#include <nlohmann/json.hpp>
-
 #include "cli/testing/Running.h"
 
 namespace zorva::cli {
 namespace {
-
-using nlohmann::json;
-using testing::HasSubstr;
 
 TEST_F(Changing, DnsCommandsChangeTheServers) {
   done(host_, {"dns", "set", "eth0", "192.0.2.1", "2001:db8::1"});

@@ -1,6 +1,3 @@
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
 #include "cli/testing/Running.h"
 
 namespace zorva::cli {

@@ -1,21 +1,9 @@
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
 #include <filesystem>
-#include <nlohmann/json.hpp>
 
 #include "cli/testing/Running.h"
 
 namespace zorva::cli {
 namespace {
-
-using nlohmann::json;
-using testing::AllOf;
-using testing::EndsWith;
-using testing::HasSubstr;
-using testing::StartsWith;
-
-constexpr const char* kEth0 = R"(ZORVA_DNSProtocolEndPoint.Name="eth0")";
 
 TEST(Graph, ReachesEveryObjectAndNamesWhatCannotBeFetched) {
   const std::string text = shown(TestHost(), {"graph"});
@@ -30,7 +18,7 @@ TEST(Graph, ReachesEveryObjectAndNamesWhatCannotBeFetched) {
 }
 
 TEST(Graph, CanBeginAtOneObject) {
-  EXPECT_THAT(shown(TestHost(), {"graph", kEth0}), StartsWith("ZORVA_DNSProtocolEndPoint."));
+  EXPECT_THAT(shown(TestHost(), {"graph", kEndpoint}), StartsWith("ZORVA_DNSProtocolEndPoint."));
 }
 
 TEST(Graph, ShowsWhatIsThereWithoutTheCompanionLibrary) {

@@ -1,19 +1,9 @@
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
 #include <filesystem>
-#include <nlohmann/json.hpp>
 
 #include "cli/testing/Running.h"
 
 namespace zorva::cli {
 namespace {
-
-using nlohmann::json;
-using testing::AllOf;
-using testing::HasSubstr;
-using testing::StartsWith;
-using zorva::agent::testing::contentsOf;
 
 TEST(IfcfgInit, WritesAllSixKeysFromTheHost) {
   const TestHost host;

@@ -1,19 +1,7 @@
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
-#include <nlohmann/json.hpp>
-
 #include "cli/testing/Running.h"
 
 namespace zorva::cli {
 namespace {
-
-using nlohmann::json;
-using testing::AllOf;
-using testing::HasSubstr;
-using testing::Not;
-
-constexpr const char* kEndpoint = R"(ZORVA_DNSProtocolEndPoint.Name="eth0")";
 
 TEST_F(Changing, OverlayClearGivesBackWhatTheHostSays) {
   done(host_, {"mi", kEndpoint, "DomainName=set.example"});

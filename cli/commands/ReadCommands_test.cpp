@@ -1,21 +1,8 @@
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
-#include <nlohmann/json.hpp>
-
 #include "cimxml/testing/Grammar.h"
 #include "cli/testing/Running.h"
 
 namespace zorva::cli {
 namespace {
-
-using nlohmann::json;
-using testing::AllOf;
-using testing::EndsWith;
-using testing::HasSubstr;
-using testing::StartsWith;
-
-constexpr const char* kEth0 = R"(ZORVA_DNSProtocolEndPoint.Name="eth0")";
 
 TEST(Names, AreOneALine) {
   EXPECT_EQ(shown(TestHost(), {"ein", "ZORVA_DNSSettingData"}),
@@ -153,9 +140,9 @@ TEST(Get, CompletesTheKeysOfReferencesThatAreIncomplete) {
 }
 
 TEST(Get, RefusesAPropertyThatTheClassLacks) {
-  expectRefused(TestHost(), {"gi", kEth0, "--property", "Nope"}, 2,
+  expectRefused(TestHost(), {"gi", kEndpoint, "--property", "Nope"}, 2,
                 "neither ZORVA_DNSProtocolEndPoint nor a class below it has a property Nope");
-  expectRefused(TestHost(), {"ai", kEth0, "--property", "No\x1Bpe"}, 2, "no class has a property No\\x1Bpe");
+  expectRefused(TestHost(), {"ai", kEndpoint, "--property", "No\x1Bpe"}, 2, "no class has a property No\\x1Bpe");
 }
 
 TEST(Get, RefusesAPathThatIsTooLong) {
@@ -182,9 +169,9 @@ TEST(Get, ReadsPathsNestedInPaths) {
 }
 
 TEST(Get, WritesMofAndXml) {
-  EXPECT_THAT(shown(TestHost(), {"gi", kEth0, "-o", "mof"}),
+  EXPECT_THAT(shown(TestHost(), {"gi", kEndpoint, "-o", "mof"}),
               AllOf(StartsWith("instance of ZORVA_DNSProtocolEndPoint {\n"), HasSubstr("  EnabledState = 2;\n")));
-  EXPECT_THAT(shown(TestHost(), {"gi", kEth0, "-o", "xml"}),
+  EXPECT_THAT(shown(TestHost(), {"gi", kEndpoint, "-o", "xml"}),
               AllOf(StartsWith("<?xml version=\"1.0\" encoding=\"utf-8\"?>\n<CIM "),
                     HasSubstr(R"(<PROPERTY NAME="EnabledState" TYPE="uint16"><VALUE>2</VALUE></PROPERTY>)"),
                     EndsWith("</CIM>\n")));

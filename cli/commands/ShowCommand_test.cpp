@@ -1,20 +1,7 @@
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
-#include <nlohmann/json.hpp>
-
 #include "cli/testing/Running.h"
 
 namespace zorva::cli {
 namespace {
-
-using nlohmann::json;
-using testing::AllOf;
-using testing::HasSubstr;
-using testing::Not;
-using testing::StartsWith;
-
-constexpr const char* kEth0 = R"(ZORVA_DNSProtocolEndPoint.Name="eth0")";
 
 TEST(Show, HasEndpointsServersSettingsAndClasses) {
   const std::string text = shown(TestHost(), {"show"});
@@ -81,7 +68,7 @@ TEST(Classes, ReportAMissingLibraryOnce) {
 
 TEST(Show, ReportsValuesThatWereSet) {
   const TestHost host;
-  shown(host, {"modify", kEth0, "DomainName=set.example"});
+  shown(host, {"modify", kEndpoint, "DomainName=set.example"});
   EXPECT_THAT(shown(host, {"show"}), HasSubstr("DomainName          set.example              set\n"));
   host.directory().write("data/ifcfg-eth0", "DOMAINNAME=file.example\n");
   EXPECT_THAT(shown(host, {"show"}), HasSubstr("DomainName          file.example"));

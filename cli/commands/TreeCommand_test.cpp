@@ -1,15 +1,7 @@
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
-#include <nlohmann/json.hpp>
-
 #include "cli/testing/Running.h"
 
 namespace zorva::cli {
 namespace {
-
-using nlohmann::json;
-using testing::HasSubstr;
 
 TEST(Tree, IsReadBackAsTheSameTree) {
   const TestHost host({TestHost::port("eth0", R"("domain_name": "a\u0001\"b", "addresses":

@@ -1,18 +1,7 @@
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
-#include <nlohmann/json.hpp>
-
 #include "cli/testing/Running.h"
 
 namespace zorva::cli {
 namespace {
-
-using nlohmann::json;
-using testing::AllOf;
-using testing::HasSubstr;
-using testing::IsEmpty;
-using testing::StartsWith;
 
 TEST(Configuration, ThatIsWrongIsReportedInOneLine) {
   for (const auto& [toml, told] :

@@ -13,7 +13,20 @@
 
 namespace zorva::cli {
 
+using nlohmann::json;
+using testing::AllOf;
+using testing::EndsWith;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::Not;
+using testing::StartsWith;
+using zorva::agent::testing::contentsOf;
+
 using Words = std::vector<std::string>;
+
+inline constexpr const char* kEndpoint = R"(ZORVA_DNSProtocolEndPoint.Name="eth0")";
+inline constexpr const char* kSetting = R"(ZORVA_DNSSettingData.InstanceID="Computer%eth0")";
+inline constexpr const char* kGeneral = "ZORVA_DNSGeneralSettingData";
 
 /// The file of settings of eth0.
 inline constexpr const char* kWholeFile =
@@ -27,9 +40,9 @@ inline std::string shown(const TestHost& host, const Words& words) {
   return outcome.out;
 }
 
-inline nlohmann::json jsonShown(const TestHost& host, Words words) {
+inline json jsonShown(const TestHost& host, Words words) {
   words.insert(words.end(), {"--output", "json"});
-  return nlohmann::json::parse(shown(host, words));
+  return json::parse(shown(host, words));
 }
 
 /// Checks that a run ends with this exit code and this message, without standard output.
@@ -37,7 +50,7 @@ inline void expectRefused(const TestHost& host, const Words& words, int exitCode
   const Outcome outcome = host.run(words);
   EXPECT_EQ(outcome.exitCode, exitCode);
   EXPECT_EQ(outcome.out, "");
-  EXPECT_THAT(outcome.err, testing::HasSubstr(told));
+  EXPECT_THAT(outcome.err, HasSubstr(told));
 }
 
 /// Runs it; it must succeed without a warning.
@@ -52,7 +65,7 @@ inline std::string done(const TestHost& host, const Words& words) {
 inline void expectFailed(const TestHost& host, const Words& words, int exitCode, const std::string& told) {
   const Outcome outcome = host.run(words);
   EXPECT_EQ(outcome.exitCode, exitCode) << outcome.out;
-  EXPECT_THAT(outcome.err, testing::HasSubstr(told));
+  EXPECT_THAT(outcome.err, HasSubstr(told));
 }
 
 /// A host on which both interfaces have files.
@@ -60,7 +73,7 @@ class Changing : public testing::Test {
  protected:
   Changing() { host_.directory().write("data/ifcfg-eth0", kWholeFile); }
 
-  std::string file() const { return zorva::agent::testing::contentsOf(host_.dataFile("ifcfg-eth0")); }
+  std::string file() const { return contentsOf(host_.dataFile("ifcfg-eth0")); }
 
   /// The file with one line changed.
   static std::string wholeFileWith(const std::string& from, const std::string& to) {
