@@ -10,6 +10,7 @@
 #include "cimom/OperationsSelection.h"
 #include "cimxml/ClassWriter.h"
 #include "cimxml/ElementWriter.h"
+#include "util/Expected.h"
 
 namespace zorva::cimom {
 
@@ -63,28 +64,26 @@ void collect(const Class& association, const Class& source, const Question& ques
   }
 }
 
-Status findClass(const Operation& operation, const std::string& name, std::string_view what, const Class*& found) {
-  if (name.empty()) return {};
-  found = operation.classes().find(name);
-  if (found != nullptr) return {};
-  return {CMPI_RC_ERR_INVALID_PARAMETER, std::string(what) + ": there is no class \"" + name + "\""};
+/// Null if no class is named.
+Expected<const Class*, Status> findClass(const Operation& operation, const std::string& name, std::string_view what) {
+  const Class* found = operation.classes().find(name);
+  if (found != nullptr || name.empty()) return found;
+  return unexpected(Status{CMPI_RC_ERR_INVALID_PARAMETER, std::string(what) + ": there is no class \"" + name + "\""});
 }
 
 Status answerOfClass(Operation& operation, const Question& question) {
-  const Class* source = nullptr;
-  const Class* association = nullptr;
-  const Class* resultClass = nullptr;
-  Status status = findClass(operation, question.object.className, "ObjectName", source);
-  if (status.ok()) {
-    status = findClass(operation, question.filter.associationClass,
-                       question.ofReferences ? "ResultClass" : "AssocClass", association);
-  }
-  if (status.ok()) status = findClass(operation, question.filter.resultClass, "ResultClass", resultClass);
-  if (!status.ok()) return status;
+  const auto source = findClass(operation, question.object.className, "ObjectName");
+  if (!source) return source.error();
+  if (*source == nullptr) return {CMPI_RC_ERR_INVALID_PARAMETER, "ObjectName: no class is named"};
+  const auto association =
+      findClass(operation, question.filter.associationClass, question.ofReferences ? "ResultClass" : "AssocClass");
+  if (!association) return association.error();
+  const auto resultClass = findClass(operation, question.filter.resultClass, "ResultClass");
+  if (!resultClass) return resultClass.error();
   std::vector<const Class*> found;
   for (const Class* candidate : operation.classes().classes()) {
-    if (!candidate->isAssociation() || (association != nullptr && !candidate->isA(*association))) continue;
-    collect(*candidate, *source, question, resultClass, found);
+    if (!candidate->isAssociation() || (*association != nullptr && !candidate->isA(**association))) continue;
+    collect(*candidate, **source, question, *resultClass, found);
   }
   const cimxml::ClassDetail detail{false, question.selection.includeQualifiers, question.selection.includeClassOrigin,
                                    question.selection.propertyList};

@@ -8,6 +8,7 @@
 #include "cimom/OperationsSelection.h"
 #include "cimxml/ElementWriter.h"
 #include "frontend/ReadBack.h"
+#include "util/Expected.h"
 
 namespace zorva::cimom {
 
@@ -127,13 +128,15 @@ Status deleteInstance(Operation& operation) {
 }
 
 /// The property that an operation names.
-Status findProperty(const Operation& operation, const ObjectPath& path, const std::string& name,
-                    const schema::ClassProperty*& property) {
+Expected<const schema::ClassProperty*, Status> findProperty(const Operation& operation, const ObjectPath& path,
+                                                            const std::string& name) {
   const schema::Class* declared = operation.classes().find(path.className);
-  if (declared == nullptr) return {CMPI_RC_ERR_INVALID_CLASS, "there is no class \"" + path.className + "\""};
-  property = declared->findProperty(name);
-  if (property != nullptr) return {};
-  return {CMPI_RC_ERR_NO_SUCH_PROPERTY, declared->name() + " has no property \"" + name + "\""};
+  if (declared == nullptr) {
+    return unexpected(Status{CMPI_RC_ERR_INVALID_CLASS, "there is no class \"" + path.className + "\""});
+  }
+  const schema::ClassProperty* property = declared->findProperty(name);
+  if (property != nullptr) return property;
+  return unexpected(Status{CMPI_RC_ERR_NO_SUCH_PROPERTY, declared->name() + " has no property \"" + name + "\""});
 }
 
 Status getProperty(Operation& operation) {
@@ -142,9 +145,10 @@ Status getProperty(Operation& operation) {
   const std::string name = arguments.requiredText("PropertyName");
   Status status = arguments.status();
   if (status.ok()) status = canonicalizePath(operation, path);
-  const schema::ClassProperty* property = nullptr;
-  if (status.ok()) status = findProperty(operation, path, name, property);
   if (!status.ok()) return status;
+  const auto found = findProperty(operation, path, name);
+  if (!found) return found.error();
+  const schema::ClassProperty* property = *found;
   broker::Selection selection;
   selection.propertyList = {property->name};
   Instance instance;
@@ -166,9 +170,10 @@ Status setProperty(Operation& operation) {
   broker::Value value = arguments.value("NewValue");
   Status status = arguments.status();
   if (status.ok()) status = canonicalizePath(operation, instance.path);
-  const schema::ClassProperty* property = nullptr;
-  if (status.ok()) status = findProperty(operation, instance.path, name, property);
   if (!status.ok()) return status;
+  const auto found = findProperty(operation, instance.path, name);
+  if (!found) return found.error();
+  const schema::ClassProperty* property = *found;
   canonicalizeValue(operation, value);
   if (value.isNull) value = broker::Value::null(property->type, property->isArray);
   instance.properties.push_back({property->name, std::move(value), property});

@@ -19,8 +19,6 @@
 #include "cli/session/Session.h"
 #include "util/FileDescriptor.h"
 
-extern char** environ;
-
 namespace zorva::cli {
 
 namespace {
