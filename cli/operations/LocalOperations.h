@@ -23,7 +23,7 @@ class LocalOperations : public Operations {
   }
   broker::Status getInstance(const broker::ObjectPath& path, const broker::Selection& selection,
                              broker::Instance& instance) override {
-    const broker::Status status = broker_.getInstance(path, selection, instance);
+    broker::Status status = broker_.getInstance(path, selection, instance);
     // In the order of the request, not the provider's.
     if (status.ok()) instance.path.keys = path.keys;
     return status;
