@@ -6,11 +6,12 @@ namespace zorva::agent {
 namespace {
 
 std::string domainOf(const std::string& nodeName, const std::string& hosts, const std::string& resolvConf = "") {
-  return findHostNames(nodeName, hosts, parseResolvConf(resolvConf)).domain;
+  return findHostNames(nodeName, hosts, parseResolvConf(resolvConf, nodeName)).domain;
 }
 
 TEST(HostNames, AWholeNodeNameIsSplitAtItsFirstDot) {
-  const HostNames names = findHostNames("host1.lab.example.org", "", parseResolvConf("domain other.org\n"));
+  const HostNames names =
+      findHostNames("host1.lab.example.org", "", parseResolvConf("domain other.org\n", "host1.lab.example.org"));
   EXPECT_EQ(names.host, "host1");
   EXPECT_EQ(names.domain, "lab.example.org");
 }

@@ -7,6 +7,7 @@
 #include <unordered_set>
 #include <utility>
 
+#include "agent/sources/DnsProperties.h"
 #include "util/HostName.h"
 #include "util/ReadFile.h"
 #include "util/Text.h"
@@ -18,6 +19,7 @@ using namespace ZV::NodeLexicon;
 
 constexpr std::size_t kLargestFile = std::size_t{64} << 10;
 constexpr const char* kComputer = "Computer";
+constexpr const char* kResolvConf = "/etc/resolv.conf";
 
 // Raw enabled states, as in PROP_ENABLED_STATE.
 constexpr unsigned int kUpWithCarrier = 1;
@@ -51,8 +53,6 @@ unsigned int protocolType(const AddressList& addresses) {
   return ipv4 ? kIPv4 : kIPv6;
 }
 
-SharedStrings share(StringList list) { return std::make_shared<const StringList>(std::move(list)); }
-
 using AddressesOfLinks = std::unordered_map<int, AddressList>;
 
 AddressesOfLinks addressesByLink(LinkTable& table) {
@@ -65,28 +65,31 @@ AddressesOfLinks addressesByLink(LinkTable& table) {
 
 HostSource::HostSource(HostSourceOptions options)
     : options_(std::move(options)),
-      resolvConf_(options_.root + "/etc/resolv.conf"),
+      resolvConf_(options_.root + kResolvConf),
       stubResolvConf_(options_.root + "/run/systemd/resolve/resolv.conf"),
       hosts_(options_.root + "/etc/hosts"),
+      owners_(options_.root),
       watch_(options_.comparisons) {}
 
 bool HostSource::changed() {
   if (!watching_) return true;
   const bool linksChanged = monitor_.changed();
+  const bool ownersChanged = owners_.changed();
   if (watch_.changed()) filesMoved_ = true;
-  return linksChanged || filesMoved_ || unread_ || util::kernelHostName() != nodeName_;
+  return linksChanged || ownersChanged || filesMoved_ || unread_ || util::kernelHostName() != nodeName_;
 }
 
 void HostSource::reopen() {
   watching_ = false;
   watch_ = FileWatch(options_.comparisons);
   reader_.close();
+  owners_.reopen();
 }
 
 // Called before anything is read, so that changes during the reading are reported afterwards.
 void HostSource::startWatching() {
   if (!watching_) monitor_.open();
-  if (!watching_ || filesMoved_) watch_.watch({resolvConf_, stubResolvConf_, hosts_});
+  if (!watching_ || filesMoved_) watch_.watch({resolvConf_, stubResolvConf_, hosts_, owners_.busSocket()});
   watching_ = true;
   filesMoved_ = false;
 }
@@ -97,30 +100,38 @@ std::shared_ptr<const TreeSnapshot> HostSource::read() {
   nodeName_ = util::kernelHostName();
   const Resolver resolver = readResolver();
   LinkTable table = reader_.read();
+  owners_.look(table.links);
+  const bool owned = owners_.speakForAny(table.links);
+  const CommonLists common = owned ? CommonLists() : commonLists(resolver);
+  // While interfaces have domains of their own, the search list of all of them together is nobody's domain.
+  const HostNames names = findHostNames(nodeName_, resolver.hosts, owned ? ResolvConf() : resolver.conf);
   AddressesOfLinks addresses = addressesByLink(table);
 
   TreeBuilder builder(nodeName_);
   constexpr std::size_t kNodesOfLink = 2;
   builder.reserve(kNodesOfLink * table.links.size() + kNodesOfLink);
   const std::size_t system = builder.add(0, NodeType::System, "system", product());
+  setSystem(builder, system, resolver);
   std::unordered_set<std::string_view> seen;
   for (const Link& link : table.links) {
     if ((link.flags & IFF_LOOPBACK) != 0 && !options_.includeLoopback) continue;
     // An interrupted dump may contain one name twice; the event of that change will follow.
     if (!seen.insert(link.name).second) continue;
-    const auto own = std::make_shared<const AddressList>(std::move(addresses[link.index]));
     const std::size_t port = builder.add(system, NodeType::Port, link.name);
     const std::size_t node = builder.add(port, NodeType::NetworkIPConfig, "ip");
-    builder.set(node, PROP_NAME, link.name);
-    builder.set(node, PROP_HOST_NAME, resolver.names.host);
-    if (!resolver.names.domain.empty()) builder.set(node, PROP_DOMAIN_NAME, resolver.names.domain);
-    if (resolver.search != nullptr) builder.set(node, PROP_DNS_SUFFIXES, resolver.search);
-    if (resolver.servers != nullptr) builder.set(node, PROP_DNS_SERVER_ADDRESSES, resolver.servers);
-    builder.set(node, PROP_PROTOCOL_IF_TYPE, protocolType(*own));
-    builder.set(node, PROP_ENABLED_STATE, enabledState(link));
-    builder.set(node, kAddresses, own);
+    builder.set(node, PROP_HOST_NAME, names.host);
+    if (!names.domain.empty()) builder.set(node, PROP_DOMAIN_NAME, names.domain);
+    setLink(builder, node, link, std::move(addresses[link.index]));
+    setDns(builder, node, link, owned ? nullptr : &common);
   }
   return builder.finish();
+}
+
+void HostSource::setLink(TreeBuilder& builder, std::size_t node, const Link& link, AddressList addresses) {
+  builder.set(node, PROP_NAME, link.name);
+  builder.set(node, PROP_PROTOCOL_IF_TYPE, protocolType(addresses));
+  builder.set(node, PROP_ENABLED_STATE, enabledState(link));
+  builder.set(node, kAddresses, std::make_shared<const AddressList>(std::move(addresses)));
 }
 
 // A line that the limit cuts is left out.
@@ -137,20 +148,48 @@ std::string HostSource::linesOf(const std::string& path) { return readLines(path
 HostSource::Resolver HostSource::readResolver() {
   Resolver result;
   const util::FileText file = readLines(resolvConf_);
-  ResolvConf conf;
-  if (file.error == 0) {
-    conf = parseResolvConf(file.text);
-    StringList servers = conf.servers;
-    if (namesOnlyLocalStub(conf)) {
-      const ResolvConf stub = parseResolvConf(linesOf(stubResolvConf_));
-      if (!stub.servers.empty()) servers = stub.servers;
-    }
-    result.servers = share(std::move(servers));
-    result.search = share(conf.search);
+  result.known = !util::mayPass(file.error);
+  // A file that is not there, or may not be read, is an empty one to the resolver.
+  result.conf = parseResolvConf(file.text, nodeName_);
+  result.servers = result.conf.servers;
+  if (namesOnlyLocalStub(result.conf)) {
+    const util::FileText behind = readLines(stubResolvConf_);
+    const ResolvConf conf = parseResolvConf(behind.text, {});
+    if (behind.error == 0 && conf.servers != StringList{"127.0.0.1"}) result.servers = conf.servers;
   }
   const bool hasDomain = nodeName_.find('.') != std::string::npos;
-  result.names = findHostNames(nodeName_, hasDomain ? std::string() : linesOf(hosts_), conf);
+  if (!hasDomain) result.hosts = linesOf(hosts_);
   return result;
+}
+
+HostSource::CommonLists HostSource::commonLists(const Resolver& resolver) {
+  if (!resolver.known) return {};
+  return {share(resolver.servers), share(resolver.conf.search)};
+}
+
+void HostSource::setSystem(TreeBuilder& builder, std::size_t node, const Resolver& resolver) const {
+  if (resolver.known) setResolverProperties(builder, node, resolver.conf);
+  const DnsFacts* facts = owners_.hostFacts();
+  if (facts == nullptr) return;
+  builder.set(node, PROP_DNS_SERVER_ADDRESSES, share(facts->servers));
+  builder.set(node, PROP_DNS_SUFFIXES, share(facts->suffixes));
+  setDnsProperties(builder, node, *facts);
+}
+
+// common is null where owners speak for the interfaces.
+void HostSource::setDns(TreeBuilder& builder, std::size_t node, const Link& link, const CommonLists* common) const {
+  DnsFacts facts = owners_.factsOf(link);
+  if (common == nullptr) {
+    builder.set(node, PROP_DNS_SERVER_ADDRESSES, share(facts.servers));
+    builder.set(node, PROP_DNS_SUFFIXES, share(facts.suffixes));
+    if (!facts.domain.empty()) builder.set(node, PROP_DOMAIN_NAME, facts.domain);
+  } else if (common->servers != nullptr) {
+    builder.set(node, PROP_DNS_SERVER_ADDRESSES, common->servers);
+    builder.set(node, PROP_DNS_SUFFIXES, common->search);
+    facts.owner = kResolvConf;
+    facts.profile.clear();
+  }
+  setDnsProperties(builder, node, facts);
 }
 
 // The maker's name of the product, if the firmware reports it. It does not change while the machine runs.

@@ -5,6 +5,7 @@
 #include <string>
 
 #include "agent/files/FileWatch.h"
+#include "agent/sources/DnsOwners.h"
 #include "agent/sources/HostNames.h"
 #include "agent/sources/Netlink.h"
 #include "agent/tree/TreeSource.h"
@@ -18,35 +19,48 @@ struct HostSourceOptions {
   int comparisons = FileWatch::kComparisons;  ///< comparisons of files before they are watched
 };
 
-/// Interfaces with state and addresses from the kernel; names from the kernel, /etc/hosts and resolv.conf; DNS servers
-/// and search domains from /etc/resolv.conf, the same for every interface. The tree is that of the network namespace
-/// and UTS namespace of the thread that asks first.
+/// Interfaces with state and addresses from the kernel; names from the kernel, /etc/hosts and resolv.conf. DNS servers
+/// and domains of each interface come from who owns them (DnsOwners). Where no owner names any for any interface, every
+/// interface has those that programs use: what the C library makes of /etc/resolv.conf, and behind the local stub of
+/// systemd-resolved the servers that this asks. The tree is that of the network namespace, the UTS namespace and the
+/// message bus of the thread that asks first.
 ///
-/// If /etc/resolv.conf cannot be read, or is no regular file, the nodes have no servers and no suffixes. If it can be
-/// read and names none, they have empty lists. Only its first 64 KiB are read.
+/// Where /etc/resolv.conf cannot be read for a reason that may pass, the nodes have no such lists. What stands past its
+/// first 64 KiB is not looked at.
 class HostSource : public TreeSource {
  public:
   explicit HostSource(HostSourceOptions options = {});
 
   bool changed() override;
 
-  /// Throws std::runtime_error, with one line, if the kernel cannot be queried.
+  /// / Throws std::runtime_error, with one line, if the kernel cannot be queried.
   std::shared_ptr<const TreeSnapshot> read() override;
 
   void reopen() override;
 
  private:
-  /// The content of the files.
+  /// / The content of the files.
   struct Resolver {
-    SharedStrings servers;  ///< null: not known
+    bool known = false;
+    ResolvConf conf;
+    StringList servers;  ///< also behind the local stub
+    std::string hosts;
+  };
+
+  /// The lists that every interface has where no owner has any; null where they are not known.
+  struct CommonLists {
+    SharedStrings servers;
     SharedStrings search;
-    HostNames names;
   };
 
   void startWatching();
   util::FileText readLines(const std::string& path);
   std::string linesOf(const std::string& path);
   Resolver readResolver();
+  static CommonLists commonLists(const Resolver& resolver);
+  void setSystem(TreeBuilder& builder, std::size_t node, const Resolver& resolver) const;
+  static void setLink(TreeBuilder& builder, std::size_t node, const Link& link, AddressList addresses);
+  void setDns(TreeBuilder& builder, std::size_t node, const Link& link, const CommonLists* common) const;
   std::string product();
 
   HostSourceOptions options_;
@@ -56,6 +70,7 @@ class HostSource : public TreeSource {
 
   LinkMonitor monitor_;
   LinkReader reader_;
+  DnsOwners owners_;
   FileWatch watch_;
   bool watching_ = false;
   bool filesMoved_ = true;  ///< the ways to the files must be followed again

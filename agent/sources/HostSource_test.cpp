@@ -68,22 +68,23 @@ TEST_F(HostFiles, ServersAndSuffixesComeFromResolvConf) {
   EXPECT_EQ(reads_, 1) << "nothing is read again while nothing changes";
 }
 
-TEST_F(HostFiles, WithoutResolvConfThereAreNoListsAndWithAnEmptyOneTheyAreEmpty) {
+const StringList kResolversDefault{"127.0.0.1"};
+
+TEST_F(HostFiles, WithoutServersTheResolverAsksItsOwnHost) {
   HostSource source(options_);
-  EXPECT_EQ(look(source).list(PROP_DNS_SERVER_ADDRESSES), nullptr);
-  EXPECT_EQ(look(source).list(PROP_DNS_SUFFIXES), nullptr);
+  EXPECT_EQ(servers(source), kResolversDefault) << "without a file";
   directory_.write("etc/resolv.conf", "");
-  EXPECT_TRUE(servers(source).empty());
-  EXPECT_TRUE(look(source).list(PROP_DNS_SUFFIXES)->empty());
+  EXPECT_EQ(servers(source), kResolversDefault) << "with an empty one";
+  EXPECT_EQ(*look(source).text(kDnsOwner), "/etc/resolv.conf");
 }
 
 TEST_F(HostFiles, ResolvConfThatIsNoRegularFileCountsAsAbsent) {
   directory_.link("/dev/zero", "etc/resolv.conf");
   HostSource source(options_);
-  EXPECT_EQ(servers(source), (StringList{"absent"})) << "an endless device";
+  EXPECT_EQ(servers(source), kResolversDefault) << "an endless device";
   fs::remove(directory_ / "etc/resolv.conf");
   fs::create_directory(directory_ / "etc/resolv.conf");
-  EXPECT_EQ(servers(source), (StringList{"absent"})) << "a directory";
+  EXPECT_EQ(servers(source), kResolversDefault) << "a directory";
 }
 
 TEST_F(HostFiles, ResolvConfThatMayNotBeReadCountsAsAbsentUntilItMay) {
@@ -93,20 +94,31 @@ TEST_F(HostFiles, ResolvConfThatMayNotBeReadCountsAsAbsentUntilItMay) {
   EXPECT_TRUE(succeedsInChild([this] {
     HostSource source(options_);
     if (::getuid() == 0 && ::seteuid(65534) != 0) return false;
-    const bool absent = servers(source) == StringList{"absent"};
+    const bool absent = servers(source) == kResolversDefault;
     if (::getuid() == 0 && ::seteuid(0) != 0) return false;
     fs::permissions(directory_ / "etc/resolv.conf", fs::perms::all);
     return absent && servers(source) == StringList{"192.0.2.1"};
   }));
 }
 
-TEST_F(HostFiles, OnlyTheBeginningOfAHugeResolvConfIsLookedAt) {
-  const std::string line = "nameserver 192.0.2.1\n";
-  std::string text;
-  while (text.size() < (std::size_t{1} << 20)) text += line;
+TEST_F(HostFiles, TheSystemHasWhatTheResolverMakesOfTheFile) {
+  std::string text = "search a.org b.org\noptions ndots:2 rotate\n";
+  for (const char* last : {"1", "2", "3", "4"}) text += std::string("nameserver 192.0.2.") + last + '\n';
   directory_.write("etc/resolv.conf", text);
   HostSource source(options_);
-  EXPECT_EQ(servers(source).size(), (std::size_t{64} << 10) / line.size());
+  EXPECT_EQ(servers(source), (StringList{"192.0.2.1", "192.0.2.2", "192.0.2.3"}));
+  const Node* system = tree_->find("/system");
+  EXPECT_EQ(*system->list(kResolverServers), servers(source));
+  EXPECT_EQ(*system->list(kResolverNotAsked), StringList{"192.0.2.4"});
+  EXPECT_EQ(*system->list(kResolverSearch), (StringList{"a.org", "b.org"}));
+  EXPECT_EQ(*system->list(kResolverOptions), (StringList{"ndots:2", "rotate"}));
+}
+
+TEST_F(HostFiles, OnlyTheBeginningOfAHugeResolvConfIsLookedAt) {
+  std::string text(std::size_t{64} << 10, '\n');
+  directory_.write("etc/resolv.conf", "nameserver 192.0.2.1\n" + text + "nameserver 192.0.2.2\n");
+  HostSource source(options_);
+  EXPECT_EQ(servers(source), StringList{"192.0.2.1"});
 }
 
 TEST_F(HostFiles, ALongLineWithoutEndSaysNothing) {
@@ -144,7 +156,7 @@ TEST_F(HostFiles, LinksThatLeadInACircleCountAsAbsent) {
   directory_.link("b", "etc/resolv.conf");
   directory_.link("resolv.conf", "etc/b");
   HostSource source(options_);
-  EXPECT_EQ(servers(source), (StringList{"absent"}));
+  EXPECT_EQ(servers(source), kResolversDefault);
 }
 
 TEST_F(HostFiles, TheServersOfALocalStubAreShown) {

@@ -1,6 +1,6 @@
 #pragma once
 
-// The host's resolver configuration.
+// What the host's resolver configuration says.
 
 #include <string>
 #include <string_view>
@@ -9,21 +9,23 @@
 
 namespace zorva::agent {
 
-/// The contents of a resolv.conf(5) as the resolver reads them. A keyword counts only at the very beginning of a line.
-/// Of "domain" and "search" the last one counts. Lines that begin with "#" or ";" are comments. A name server that is
-/// no IPv4 or IPv6 address (with or without a zone) is skipped. In three points the reader accepts more than the
-/// resolver: a line may end in CRLF; a word that begins with "#" or ";" starts a comment; and name servers after the
-/// third, which the resolver does not use, are listed, because the file names them. A search list that is only "." is
-/// empty.
+/// A resolv.conf(5) as glibc takes it, to the letter: a keyword counts at the very beginning of a line and with a blank
+/// after it; of "domain" and "search" the last one counts; a line's end is a line feed alone, so that a carriage return
+/// belongs to the last word, which is then no address; an IPv4 address may have any form of inet_aton(3).
+///
+/// Names with control characters are left out, as nobody could show them.
 struct ResolvConf {
-  StringList servers;
-  StringList search;   ///< from "search", or the one domain of "domain"
-  std::string domain;  ///< from "domain", if that was the last of the two
+  StringList servers;   ///< that are asked: the first three, or 127.0.0.1 where the file names none
+  StringList notAsked;  ///< what the file names beyond these, up to 256
+  StringList search;    ///< from "search" or "domain"; where neither stands, the domain of the host's name
+  std::string domain;   ///< from "domain", if that was the last of the two
+  StringList options;   ///< that the resolver knows, in its own spelling, with the values that it takes: "ndots:2"
 };
 
-ResolvConf parseResolvConf(std::string_view text);
+/// nodeName is the kernel's name of the host.
+ResolvConf parseResolvConf(std::string_view text, std::string_view nodeName);
 
-/// True if the only server is the stub on which systemd-resolved listens: its own servers are in another file.
+/// True where the only servers are the stub that systemd-resolved listens on: whom it asks in turn is told elsewhere.
 bool namesOnlyLocalStub(const ResolvConf& conf);
 
 }  // namespace zorva::agent

@@ -3,11 +3,20 @@
 // IP addresses in text form.
 
 #include <string>
+#include <vector>
 
 namespace zorva::agent {
 
 /// Whether the whole text is an address for inet_pton; without a zone.
 bool isIPv4Address(const std::string& text);
 bool isIPv6Address(const std::string& text);
+
+// Whether it is an IPv6 address of fe80::/10, which means something together with a link only.
+bool isIPv6LinkLocal(const std::string& text);
+
+// The text form of the 4 or 16 bytes of an address, empty for any other number of bytes; and back, nothing where the
+// text is no address.
+std::string textOfAddress(const std::vector<unsigned char>& address);
+std::vector<unsigned char> bytesOfAddress(const std::string& text);
 
 }  // namespace zorva::agent

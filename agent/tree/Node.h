@@ -22,9 +22,28 @@ enum class NodeType : unsigned int {
   NetworkIPConfig = ZV::NodeLexicon::NODE_NETWORK_IP_CONFIG,
 };
 
-/// The numbers of the interface headers, and one that only the agent's own readers see.
+/// The numbers of the interface headers, and those that only the agent's own readers see.
 using PropertyNumber = unsigned int;
 inline constexpr PropertyNumber kAddresses = 0x10001;  ///< the interface's IP addresses, an AddressList
+
+/// About the DNS settings of an interface. The system's node has those of the host that belong to no interface, with
+/// their servers and suffixes under the numbers of the interface headers.
+inline constexpr PropertyNumber kDnsOwner = 0x10002;           ///< text: the program or file that says so
+inline constexpr PropertyNumber kDnsProfile = 0x10003;         ///< text: the profile or file of that program's
+inline constexpr PropertyNumber kDnsOrigin = 0x10004;          ///< text: "static", "learned", or "mixed" of both
+inline constexpr PropertyNumber kDnsServersInFull = 0x10005;   ///< list: with port and name, where any has one
+inline constexpr PropertyNumber kDnsRoutingDomains = 0x10006;  ///< list: asked for here, and no suffixes
+inline constexpr PropertyNumber kDnsDefaultRoute = 0x10007;    ///< text: "yes" or "no"
+inline constexpr PropertyNumber kDnsOverTls = 0x10008;         ///< text: "yes", "opportunistic" or "no"
+inline constexpr PropertyNumber kDnssec = 0x10009;             ///< text: "yes", "allow-downgrade" or "no"
+inline constexpr PropertyNumber kLlmnr = 0x1000A;              ///< text: "yes", "resolve" or "no"
+inline constexpr PropertyNumber kMulticastDns = 0x1000B;       ///< text: "yes", "resolve" or "no"
+
+/// About the resolver of the host's programs, on the system's node: what the C library makes of /etc/resolv.conf.
+inline constexpr PropertyNumber kResolverServers = 0x1000C;   ///< list: that are asked
+inline constexpr PropertyNumber kResolverNotAsked = 0x1000D;  ///< list: servers beyond those that are asked
+inline constexpr PropertyNumber kResolverSearch = 0x1000E;    ///< list
+inline constexpr PropertyNumber kResolverOptions = 0x1000F;   ///< list: "ndots:2", "rotate"
 
 /// The origin of an address, from the kernel's flags and protocol of the address.
 enum class AddressOrigin : std::uint8_t { Unknown, Static, Dhcp, Slaac, LinkLocal };

@@ -43,6 +43,20 @@ constexpr std::array kProperties{
     PropertyName{PROP_PROTOCOL_IF_TYPE, "protocol_if_type", ValueType::Number},
     PropertyName{PROP_ENABLED_STATE, "enabled_state", ValueType::Number},
     PropertyName{kAddresses, "addresses", ValueType::Addresses},
+    PropertyName{kDnsOwner, "dns_owner", ValueType::Text},
+    PropertyName{kDnsProfile, "dns_profile", ValueType::Text},
+    PropertyName{kDnsOrigin, "dns_origin", ValueType::Text},
+    PropertyName{kDnsServersInFull, "dns_servers_in_full", ValueType::TextList},
+    PropertyName{kDnsRoutingDomains, "dns_routing_domains", ValueType::TextList},
+    PropertyName{kDnsDefaultRoute, "dns_default_route", ValueType::Text},
+    PropertyName{kDnsOverTls, "dns_over_tls", ValueType::Text},
+    PropertyName{kDnssec, "dnssec", ValueType::Text},
+    PropertyName{kLlmnr, "llmnr", ValueType::Text},
+    PropertyName{kMulticastDns, "multicast_dns", ValueType::Text},
+    PropertyName{kResolverServers, "resolver_servers", ValueType::TextList},
+    PropertyName{kResolverNotAsked, "resolver_servers_not_asked", ValueType::TextList},
+    PropertyName{kResolverSearch, "resolver_search", ValueType::TextList},
+    PropertyName{kResolverOptions, "resolver_options", ValueType::TextList},
 };
 
 struct OriginName {

@@ -28,6 +28,20 @@ constexpr PropertyWord kProperties[] = {
     {ZV::NodeLexicon::PROP_PROTOCOL_IF_TYPE, "protocol_if_type"},
     {ZV::NodeLexicon::PROP_ENABLED_STATE, "enabled_state"},
     {zorva::agent::kAddresses, "addresses"},
+    {zorva::agent::kDnsOwner, "dns_owner"},
+    {zorva::agent::kDnsProfile, "dns_profile"},
+    {zorva::agent::kDnsOrigin, "dns_origin"},
+    {zorva::agent::kDnsServersInFull, "dns_servers_in_full"},
+    {zorva::agent::kDnsRoutingDomains, "dns_routing_domains"},
+    {zorva::agent::kDnsDefaultRoute, "dns_default_route"},
+    {zorva::agent::kDnsOverTls, "dns_over_tls"},
+    {zorva::agent::kDnssec, "dnssec"},
+    {zorva::agent::kLlmnr, "llmnr"},
+    {zorva::agent::kMulticastDns, "multicast_dns"},
+    {zorva::agent::kResolverServers, "resolver_servers"},
+    {zorva::agent::kResolverNotAsked, "resolver_servers_not_asked"},
+    {zorva::agent::kResolverSearch, "resolver_search"},
+    {zorva::agent::kResolverOptions, "resolver_options"},
 };
 
 const char* originWord(zorva::agent::AddressOrigin origin) noexcept {

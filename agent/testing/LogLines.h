@@ -1,0 +1,26 @@
+#pragma once
+
+// The agent's own lines of the log.
+
+#include <string>
+#include <vector>
+
+#include "agent/log/LogSink.h"
+
+namespace zorva::agent::testing {
+
+/// Takes the lines that the agent itself writes while this exists. One at a time.
+class LogLines : public LogSink {
+ public:
+  LogLines() { setLogSink(this); }
+  ~LogLines() override { setLogSink(nullptr); }
+  LogLines(const LogLines&) = delete;
+  LogLines& operator=(const LogLines&) = delete;
+
+  void record(const LogCall&) override {}
+  void recordOwn(int, const std::string& message) override { lines.push_back(message); }
+
+  std::vector<std::string> lines;
+};
+
+}  // namespace zorva::agent::testing
