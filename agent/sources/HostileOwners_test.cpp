@@ -11,6 +11,7 @@
 #include "agent/testing/LogLines.h"
 #include "agent/testing/NetworkNamespace.h"
 #include "agent/testing/PrivateHostTest.h"
+#include "agent/testing/TemporaryDirectory.h"
 
 namespace zorva::agent {
 namespace {
@@ -178,6 +179,23 @@ TEST(HostileOwners, AProfileNameWithControlCharactersIsLeftOut) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(wrongProfileIsLeftOut));
 }
 
+// Sends every connection of the bus a signal like those of systemd-resolved: no rule of the receiver's holds that up.
+bool sendFalseSignals() {
+  sd_bus* bus = nullptr;
+  char** names = nullptr;
+  if (::sd_bus_open_system(&bus) < 0 || ::sd_bus_list_names(bus, &names, nullptr) < 0) return false;
+  for (char** name = names; *name != nullptr; ++name) {
+    sd_bus_message* signal = nullptr;
+    ::sd_bus_message_new_signal(bus, &signal, "/org/freedesktop/resolve1", "org.freedesktop.DBus.Properties",
+                                "PropertiesChanged");
+    ::sd_bus_message_append(signal, "sa{sv}as", "org.freedesktop.resolve1.Manager", 0, 0);
+    ::sd_bus_message_set_destination(signal, *name);
+    ::sd_bus_send(bus, signal, nullptr);
+    ::sd_bus_message_unref(signal);
+  }
+  return ::sd_bus_flush(bus) >= 0 && ::sd_bus_get_name_creds(bus, kResolved, 0, nullptr) >= 0;
+}
+
 bool strangersSignalsAreIgnored() {
   Daemons daemons;
   daemons.start("systemd-resolved");
@@ -187,11 +205,7 @@ bool strangersSignalsAreIgnored() {
   owners.changed();
   owners.look(links);
   EXPECT_FALSE(owners.changed());
-  for (int i = 0; i < 20; ++i) {
-    testing::outputOf(
-        "busctl emit /org/freedesktop/resolve1 org.freedesktop.DBus.Properties PropertiesChanged 'sa{sv}as' "
-        "org.freedesktop.resolve1.Manager 0 0");
-  }
+  EXPECT_TRUE(testing::succeedsInChild(sendFalseSignals));
   EXPECT_FALSE(owners.changed());
   return true;
 }
