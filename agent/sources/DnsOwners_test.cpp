@@ -86,7 +86,7 @@ TEST(Owners, ResolvedIsShownAndItsChangesAreNoticed) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(resolvedIsShown));
 }
 
-// Looks until that holds, for at most five seconds.
+// Looks until that holds, for at most thirty seconds.
 template <typename Condition>
 bool soon(Condition holds) {
   for (int turn = 0; turn < 1500; ++turn) {
@@ -258,7 +258,7 @@ bool leasesAreLearned() {
   EXPECT_TRUE(soon([&] { return host["eth0"].owner == "NetworkManager" && !host["eth0"].servers.empty(); }));
   EXPECT_EQ(host["eth0"].origin, DnsOrigin::Learned);
   EXPECT_EQ(host["eth0"].domain, "lease.example");
-  outputOf("nmcli connection modify lan ipv4.dns 192.0.2.9; nmcli connection up lan");
+  outputOf("nmcli connection modify lan ipv4.dns 192.0.2.9 && nmcli connection up lan");
   EXPECT_TRUE(soon([&] { return host["eth0"].servers.size() == 2; }));
   EXPECT_EQ(host["eth0"].origin, DnsOrigin::Mixed);
   return true;

@@ -74,7 +74,7 @@ constexpr const char* kAddVpn =
     "nmcli connection add type ethernet ifname tun1 con-name 'the vpn' ipv4.method manual ipv4.addresses "
     "198.51.100.10/24 ipv4.dns 198.51.100.53 ipv4.dns-search vpn.example ipv6.method disabled; "
     "nmcli connection up 'the vpn'";
-constexpr const char* kModifyLan = "nmcli connection modify lan ipv4.dns 192.0.2.99; nmcli device reapply eth0";
+constexpr const char* kModifyLan = "nmcli connection modify lan ipv4.dns 192.0.2.99 && nmcli device reapply eth0";
 constexpr const char* kSearchElsewhere =
     "nmcli connection modify lan ipv4.dns-search other.example; nmcli connection up lan";
 constexpr const char* kEndVpn = "nmcli connection down 'the vpn'";
