@@ -2,6 +2,8 @@
 
 #include <cmpimacs.h>
 
+#include "cmpi/support/CmpiSupport.h"
+
 namespace zorva::cimom {
 
 namespace {
@@ -65,9 +67,8 @@ void storeValue(const CMPIBroker* broker, const Value& plain, Store&& store) {
     storeScalar(broker, plain.scalar, type, store);
     return;
   }
-  CMPIStatus status{CMPI_RC_OK, nullptr};
   CMPIValue value{};
-  value.array = CMNewArray(broker, static_cast<CMPICount>(plain.elements.size()), type, &status);
+  value.array = cmpi::newArray(broker, static_cast<CMPICount>(plain.elements.size()), type, nullptr);
   if (value.array == nullptr) return;
   CMPICount at = 0;
   for (const Scalar& element : plain.elements) {
@@ -83,7 +84,7 @@ Value keyOf(const CMPIData& data) {
   if ((data.state & CMPI_nullValue) != 0) return Value::null(schema::Type::String);
   switch (data.type) {
     case CMPI_string:
-      return Value::text(readText(data.value.string));
+      return Value::text(cmpi::textOf(data.value.string, nullptr));
     case CMPI_chars:
       return Value::text(data.value.chars == nullptr ? "" : data.value.chars);
     case CMPI_ref:
@@ -107,7 +108,7 @@ Value keyOf(const CMPIData& data) {
 
 CMPIObjectPath* makePath(const CMPIBroker* broker, const ObjectPath& path) {
   CMPIStatus status{CMPI_RC_OK, nullptr};
-  CMPIObjectPath* const object = CMNewObjectPath(broker, path.nameSpace.c_str(), path.className.c_str(), &status);
+  CMPIObjectPath* const object = cmpi::newPath(broker, path.nameSpace, path.className.c_str(), &status);
   if (object == nullptr || status.rc != CMPI_RC_OK) return nullptr;
   if (!path.host.empty()) CMSetHostname(object, path.host.c_str());
   for (const broker::NamedValue& key : path.keys) {
@@ -121,7 +122,7 @@ CMPIObjectPath* makePath(const CMPIBroker* broker, const ObjectPath& path) {
 CMPIInstance* makeInstance(const CMPIBroker* broker, const broker::Instance& instance) {
   CMPIStatus status{CMPI_RC_OK, nullptr};
   const CMPIObjectPath* const path = makePath(broker, instance.path);
-  CMPIInstance* const object = path == nullptr ? nullptr : CMNewInstance(broker, path, &status);
+  CMPIInstance* const object = path == nullptr ? nullptr : cmpi::newInstance(broker, path, &status);
   if (object == nullptr || status.rc != CMPI_RC_OK) return nullptr;
   for (const broker::Property& property : instance.properties) {
     storeValue(broker, property.value, [&](const CMPIValue* value, CMPIType type) {
@@ -134,21 +135,16 @@ CMPIInstance* makeInstance(const CMPIBroker* broker, const broker::Instance& ins
 ObjectPath readPath(const CMPIObjectPath* path) {
   ObjectPath plain;
   if (path == nullptr) return plain;
-  plain.host = readText(CMGetHostname(path, nullptr));
-  plain.nameSpace = readText(CMGetNameSpace(path, nullptr));
-  plain.className = readText(CMGetClassName(path, nullptr));
-  const CMPICount count = CMGetKeyCount(path, nullptr);
+  plain.host = cmpi::textOf(CMGetHostname(path, nullptr), nullptr);
+  plain.nameSpace = cmpi::nameSpaceOf(path, nullptr);
+  plain.className = cmpi::classNameOf(path, nullptr);
+  const CMPICount count = cmpi::keyCountOf(path, nullptr);
   for (CMPICount i = 0; i < count; ++i) {
     CMPIString* name = nullptr;
     const CMPIData data = CMGetKeyAt(path, i, &name, nullptr);
-    plain.keys.push_back({readText(name), keyOf(data)});
+    plain.keys.push_back({cmpi::textOf(name, nullptr), keyOf(data)});
   }
   return plain;
-}
-
-std::string readText(const CMPIString* text) {
-  const char* const characters = text == nullptr ? nullptr : CMGetCharsPtr(text, nullptr);
-  return characters == nullptr ? std::string() : characters;
 }
 
 }  // namespace zorva::cimom

@@ -17,7 +17,4 @@ CMPIInstance* makeInstance(const CMPIBroker* broker, const broker::Instance& ins
 /// The empty path for null. Keys are texts, booleans, whole numbers and references; others are null.
 broker::ObjectPath readPath(const CMPIObjectPath* path);
 
-/// The empty text for null.
-std::string readText(const CMPIString* text);
-
 }  // namespace zorva::cimom

@@ -3,13 +3,12 @@
 #include <cmpidt.h>
 #include <cmpift.h>
 #include <cmpimacs.h>
-#include <unistd.h>
-
-#include <climits>
 
 #include "cimom/CmpiValues.h"
 #include "cimom/InteropModel.h"
+#include "cmpi/support/CmpiSupport.h"
 #include "schema/Schema.h"
+#include "util/HostName.h"
 #include "util/Names.h"
 
 namespace zorva::cimom {
@@ -47,8 +46,8 @@ std::vector<ObjectPath> namesOf(const CMPIBroker* broker, const CMPIContext* con
 }
 
 std::string hostName() {
-  char name[HOST_NAME_MAX + 1] = {};
-  return gethostname(name, sizeof name - 1) == 0 && name[0] != '\0' ? name : "localhost";
+  const std::string name = util::kernelHostName();
+  return name.empty() ? "localhost" : name;
 }
 
 /// The data from which the instances of a class are made. A provider is asked only if they need it: the other instances
@@ -56,7 +55,7 @@ std::string hostName() {
 InteropWorld worldAt(const CMPIBroker* broker, const CMPIContext* context, const CMPIObjectPath* asked,
                      std::string_view className) {
   InteropWorld world;
-  world.nameSpace = readText(CMGetNameSpace(asked, nullptr));
+  world.nameSpace = cmpi::nameSpaceOf(asked, nullptr);
   world.nameSpaces = servedNameSpaces();
   world.profileNameSpace = schema::sameNamespace(world.nameSpace, kEndpointNameSpace) ? kInterop : world.nameSpace;
   world.hostName = hostName();
