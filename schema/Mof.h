@@ -59,7 +59,7 @@ struct MofLimits {
 /// Reads `text` and passes its declarations to `sink`. `file` is the name in errors. Without `includer` an include is
 /// an error. Returns the first error, of the text or of the sink; declarations that the sink got before stay there.
 Expected<void, SchemaError> parseMof(std::string_view text, std::string_view file, MofSink& sink,
-                                    const MofIncluder& includer = {}, const MofLimits& limits = {});
+                                     const MofIncluder& includer = {}, const MofLimits& limits = {});
 
 /// Reads the file at `path`; its includes are relative to the file that contains them. Only regular files are read, so
 /// nothing blocks.
