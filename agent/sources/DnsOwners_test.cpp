@@ -31,7 +31,7 @@ void makeCables() {
   for (const char* name : {"eth0", "far0", "tun1", "far1"}) interfaces.setUp(name, true);
 }
 
-// The owners as one who asks from time to time sees them.
+// Asks the owners again at each look, as a cursor does.
 class Observer {
  public:
   const DnsFacts& operator[](const std::string& name) {

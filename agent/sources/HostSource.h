@@ -20,30 +20,30 @@ struct HostSourceOptions {
 };
 
 /// Interfaces with state and addresses from the kernel; names from the kernel, /etc/hosts and resolv.conf. DNS servers
-/// and domains of each interface come from who owns them (DnsOwners). Where no owner names any for any interface, every
-/// interface has those that programs use: what the C library makes of /etc/resolv.conf, and behind the local stub of
-/// systemd-resolved the servers that this asks. The tree is that of the network namespace, the UTS namespace and the
-/// message bus of the thread that asks first.
+/// and domains of each interface come from their owner (DnsOwners). If no owner names any for any interface, every
+/// interface has the lists that programs use: those that the C library reads from /etc/resolv.conf. If that file names
+/// only the stub resolver of systemd-resolved, the servers are those that the stub resolver asks. The tree is that of
+/// the network namespace, the UTS namespace and the message bus of the thread that asks first.
 ///
-/// Where /etc/resolv.conf cannot be read for a reason that may pass, the nodes have no such lists. What stands past its
-/// first 64 KiB is not looked at.
+/// If /etc/resolv.conf cannot be read for a reason that may pass, the nodes have no such lists. Only its first 64 KiB
+/// are read.
 class HostSource : public TreeSource {
  public:
   explicit HostSource(HostSourceOptions options = {});
 
   bool changed() override;
 
-  /// / Throws std::runtime_error, with one line, if the kernel cannot be queried.
+  /// Throws std::runtime_error, with one line, if the kernel cannot be queried.
   std::shared_ptr<const TreeSnapshot> read() override;
 
   void reopen() override;
 
  private:
-  /// / The content of the files.
+  /// The content of the files.
   struct Resolver {
     bool known = false;
     ResolvConf conf;
-    StringList servers;  ///< also behind the local stub
+    StringList servers;  ///< with those that a local stub resolver asks, in its place
     std::string hosts;
   };
 
@@ -65,7 +65,7 @@ class HostSource : public TreeSource {
 
   HostSourceOptions options_;
   std::string resolvConf_;
-  std::string stubResolvConf_;  ///< lists the servers of a local stub
+  std::string stubResolvConf_;  ///< the file with the servers that a local stub resolver asks
   std::string hosts_;
 
   LinkMonitor monitor_;

@@ -66,7 +66,7 @@ bool holds(const StringList& list, const std::string& value) {
   return std::find(list.begin(), list.end(), value) != list.end();
 }
 
-// By hand is what stands in the profile.
+// A value that the profile names was set by hand.
 DnsOrigin originOf(const StringList& used, const StringList& inProfile) {
   const auto byHand =
       std::count_if(used.begin(), used.end(), [&](const std::string& value) { return holds(inProfile, value); });

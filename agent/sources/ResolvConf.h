@@ -25,7 +25,7 @@ struct ResolvConf {
 /// nodeName is the kernel's name of the host.
 ResolvConf parseResolvConf(std::string_view text, std::string_view nodeName);
 
-/// True where the only servers are the stub that systemd-resolved listens on: whom it asks in turn is told elsewhere.
+/// True if the only server is the stub resolver of systemd-resolved. The servers that it asks are in a file of its own.
 bool namesOnlyLocalStub(const ResolvConf& conf);
 
 }  // namespace zorva::agent

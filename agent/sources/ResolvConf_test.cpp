@@ -219,7 +219,7 @@ class Listeners {
       place.sin_port = htons(53);
       ::inet_pton(AF_INET, address.c_str(), &place.sin_addr);
       if (::bind(socket.get(), reinterpret_cast<sockaddr*>(&place), sizeof place) != 0) {
-        throw std::runtime_error("nobody can listen on " + address);
+        throw std::runtime_error("cannot listen on " + address);
       }
       sockets_.push_back(std::move(socket));
     }

@@ -1,4 +1,4 @@
-// graph.
+// graph: the objects and their associations as text for Graphviz, or drawn by it.
 
 #include <fcntl.h>
 #include <spawn.h>
