@@ -3,6 +3,8 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <signal.h>
+#include <sys/stat.h>
+#include <unistd.h>
 
 #include <cstdio>
 #include <cstdlib>
@@ -168,6 +170,21 @@ TEST_F(Locking, WhoMayNotWriteReadsWhileOthersChange) {
   if (outcome.exitCode == 127) GTEST_SKIP() << "another user cannot run what was built here";
   EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
   EXPECT_EQ(outcome.err, "");
+}
+
+TEST_F(Locking, WhatRootWritesBelongsToTheOwnerOfTheDataDirectory) {
+  if (::geteuid() != 0) GTEST_SKIP() << "only root gives files away";
+  constexpr uid_t kOwner = 65534;
+  ASSERT_EQ(::chown(host_.dataFile("").c_str(), kOwner, kOwner), 0);
+  EXPECT_TRUE(runs({"ifcfg", "init", "eth1"}));
+  EXPECT_TRUE(runs({"dns", "set", "eth0", "192.0.2.54"}));
+  EXPECT_TRUE(runs({"modify", R"(ZORVA_DNSProtocolEndPoint.Name="eth0")", "DomainName=lab.example.org"}));
+  for (const char* name : {"ifcfg-eth1", "settings.lock", "settings.turn", "overlay.json", "overlay.lock"}) {
+    struct stat status {};
+    ASSERT_EQ(::stat(host_.dataFile(name).c_str(), &status), 0) << name;
+    EXPECT_EQ(status.st_uid, kOwner) << name;
+    EXPECT_EQ(status.st_gid, kOwner) << name;
+  }
 }
 
 TEST_F(Locking, WhatReadsNoFileDoesNotWait) {

@@ -52,7 +52,11 @@ std::string replaceFile(const std::string& directory, const std::string& name, c
     const FileDescriptor file(::open(temporary.path().c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC | O_NOFOLLOW,
                                      like == nullptr ? kFileMode : S_IRUSR | S_IWUSR));
     if (!file) throwFileError(temporary.path(), "cannot be opened");
-    if (like != nullptr) giveRights(file, *like);
+    if (like != nullptr) {
+      giveRights(file, *like);
+    } else {
+      giveToOwnerOfDirectory(file, temporary.path());
+    }
     writeAndSync(file, text, temporary.path());
   }
   if (::rename(temporary.path().c_str(), target.c_str()) != 0) throwFileError(target, "cannot be replaced");
@@ -65,6 +69,17 @@ void overwriteFile(const std::string& path, const std::string& text) {
   const FileDescriptor file(::open(path.c_str(), O_WRONLY | O_TRUNC | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
   if (!file) throwFileError(path, "cannot be opened");
   writeAndSync(file, text, path);
+}
+
+void giveToOwnerOfDirectory(const FileDescriptor& file, const std::string& path) {
+  if (::geteuid() != 0) return;
+  const std::size_t slash = path.rfind('/');
+  const std::string directory = slash == std::string::npos ? "." : path.substr(0, slash + 1);
+  struct stat owner {};
+  struct stat own {};
+  if (::stat(directory.c_str(), &owner) != 0 || ::fstat(file.get(), &own) != 0) return;
+  if (own.st_uid == owner.st_uid && own.st_gid == owner.st_gid) return;
+  (void)!::fchown(file.get(), owner.st_uid, owner.st_gid);
 }
 
 bool writeAll(const FileDescriptor& file, std::string_view text) {

@@ -9,6 +9,7 @@
 #include <utility>
 
 #include "util/FileError.h"
+#include "util/ReplaceFile.h"
 
 namespace zorva::agent {
 namespace {
@@ -26,7 +27,9 @@ util::FileDescriptor opened(const std::string& path) {
 }  // namespace
 
 util::FileDescriptor openLockFile(const std::string& path, mode_t rights) {
-  return util::FileDescriptor(::open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK, rights));
+  util::FileDescriptor file(::open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK, rights));
+  if (file) util::giveToOwnerOfDirectory(file, path);
+  return file;
 }
 
 FileLock::Deadline FileLock::usualDeadline() { return std::chrono::steady_clock::now() + kLongestWait; }
