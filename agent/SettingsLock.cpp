@@ -46,11 +46,12 @@ util::FileDescriptor openForChange(const std::string& directory, const char* nam
   return file;
 }
 
-// None if that file cannot be opened or made.
+// None if that file cannot be opened or made. Not for writing where it exists: closing such a file counts as a change of
+// the directory for those who watch it.
 util::FileDescriptor openForRead(const std::string& directory, const char* name) {
-  util::FileDescriptor file = openLockFile(directory + name, lockRights(directory));
-  if (file) return file;
-  return util::FileDescriptor(::open((directory + name).c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
+  util::FileDescriptor file(::open((directory + name).c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
+  if (file || errno != ENOENT) return file;
+  return openLockFile(directory + name, lockRights(directory));
 }
 
 std::string interfaceFile(const std::string& directory, const std::string& interface) {

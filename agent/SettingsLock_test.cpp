@@ -4,6 +4,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <sys/file.h>
+#include <sys/inotify.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -40,6 +41,22 @@ TEST(SettingsLock, ReadersShareItAndAChangeHasItAlone) {
   }
   const SettingsLock change(directory.path(), Access::Change);
   EXPECT_FALSE(canLock(directory / "settings.lock", LOCK_SH));
+}
+
+TEST(SettingsLock, ReadingIsNoChangeOfTheDirectory) {
+  const TemporaryDirectory directory;
+  { const SettingsLock makesTheFiles(directory.path(), Access::Read); }
+  const util::FileDescriptor watch(::inotify_init1(IN_CLOEXEC | IN_NONBLOCK));
+  constexpr std::uint32_t kChanges = IN_CLOSE_WRITE | IN_CREATE | IN_DELETE | IN_MOVE | IN_ATTRIB | IN_MODIFY;
+  ASSERT_GE(::inotify_add_watch(watch.get(), directory.path().c_str(), kChanges), 0);
+  const auto hasChanged = [&] {
+    char events[4096];
+    return ::read(watch.get(), events, sizeof events) > 0;
+  };
+  { const SettingsLock read(directory.path(), Access::Read); }
+  EXPECT_FALSE(hasChanged());
+  { const SettingsLock change(directory.path(), Access::Change); }
+  EXPECT_TRUE(hasChanged());
 }
 
 TEST(FileLock, WaitsNoLongerThanAllowed) {
