@@ -9,8 +9,6 @@
 #include <cstring>
 #include <utility>
 
-#include "util/FileDescriptor.h"
-
 namespace zorva::agent {
 namespace {
 
@@ -19,27 +17,6 @@ constexpr int kMostMessages = 4096;
 
 [[noreturn]] void fail(const char* what, int result) {
   throw BusError(std::string(what) + " cannot be read: " + std::strerror(-result));
-}
-
-struct DropMessage {
-  void operator()(sd_bus_message* message) const { ::sd_bus_message_unref(message); }
-};
-using Message = std::unique_ptr<sd_bus_message, DropMessage>;
-
-util::FileDescriptor connectTo(const std::string& path) {
-  sockaddr_un address{};
-  address.sun_family = AF_UNIX;
-  errno = ENAMETOOLONG;
-  if (path.size() >= sizeof address.sun_path) return {};
-  path.copy(address.sun_path, path.size());
-  util::FileDescriptor socket(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0));
-  if (!socket || ::connect(socket.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address) == 0) {
-    return socket;
-  }
-  const int error = errno;
-  socket.reset();
-  errno = error;
-  return {};
 }
 
 template <typename Number>
@@ -124,7 +101,7 @@ void SystemBus::DropSubscription::operator()(Subscription* subscription) const {
 
 bool SystemBus::open() {
   if (bus_ != nullptr) return true;
-  util::FileDescriptor socket = connectTo(socketPath_);
+  util::FileDescriptor socket = connectToSocket(socketPath_);
   refused_ = !socket && (errno == ECONNREFUSED || errno == EAGAIN);
   if (!socket || ::sd_bus_new(&bus_) < 0) return false;
   hasMore_ = true;
@@ -157,7 +134,7 @@ SystemBus::Handle SystemBus::call(const Method& method, const std::vector<std::s
   sd_bus_message* made = nullptr;
   int result = ::sd_bus_message_new_method_call(bus_, &made, method.destination.c_str(), method.path.c_str(),
                                                 method.interface.c_str(), method.member.c_str());
-  const Message message(made);
+  const BusMessage message(made);
   if (result >= 0) result = ::sd_bus_message_set_auto_start(made, 0);
   for (const std::string& argument : arguments) {
     if (result >= 0) result = ::sd_bus_message_append_basic(made, SD_BUS_TYPE_STRING, argument.c_str());
@@ -209,6 +186,22 @@ bool SystemBus::handleArrived() {
 
 void SystemBus::wait(std::chrono::microseconds longest) {
   ::sd_bus_wait(bus_, static_cast<std::uint64_t>(longest.count()));
+}
+
+util::FileDescriptor connectToSocket(const std::string& path) {
+  sockaddr_un address{};
+  address.sun_family = AF_UNIX;
+  errno = ENAMETOOLONG;
+  if (path.size() >= sizeof address.sun_path) return {};
+  path.copy(address.sun_path, path.size());
+  util::FileDescriptor socket(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0));
+  if (!socket || ::connect(socket.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address) == 0) {
+    return socket;
+  }
+  const int error = errno;
+  socket.reset();
+  errno = error;
+  return {};
 }
 
 std::string senderOf(sd_bus_message* message) {

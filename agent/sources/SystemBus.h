@@ -15,6 +15,8 @@
 #include <string_view>
 #include <vector>
 
+#include "util/FileDescriptor.h"
+
 namespace zorva::agent {
 
 /// A message has other contents than its sender promises.
@@ -22,6 +24,11 @@ class BusError : public std::runtime_error {
  public:
   using std::runtime_error::runtime_error;
 };
+
+struct DropBusMessage {
+  void operator()(sd_bus_message* message) const { ::sd_bus_message_unref(message); }
+};
+using BusMessage = std::unique_ptr<sd_bus_message, DropBusMessage>;
 
 /// Reads the values of a message one after another. Throws BusError where a value is of another type than asked for.
 class BusReader {
@@ -167,5 +174,8 @@ class SystemBus {
 
 /// The owner of a signal or an answer.
 std::string senderOf(sd_bus_message* message);
+
+/// Connects to a socket in the file system without waiting. None, with errno, if that fails.
+util::FileDescriptor connectToSocket(const std::string& path);
 
 }  // namespace zorva::agent
