@@ -8,6 +8,7 @@
 #include <utility>
 
 #include "agent/Seams.h"
+#include "agent/apply/Apply.h"
 #include "agent/config/CurrentConfig.h"
 #include "agent/log/LogOutput.h"
 #include "agent/sources/FileSource.h"
@@ -62,6 +63,12 @@ std::shared_ptr<const TreeSnapshot> Runtime::look() {
     ZORVAGENT_LOG_ERROR(std::string("the tree cannot be read: ") + error.what());
     throw;
   }
+}
+
+std::shared_ptr<const TreeSnapshot> Runtime::lookAtSource() {
+  const std::lock_guard lock(lookMutex_);
+  lookAndRead();
+  return sourceTree_;
 }
 
 std::shared_ptr<const TreeSnapshot> Runtime::lookAndRead() {
@@ -157,12 +164,7 @@ bool Runtime::store(const std::string& path, PropertyNumber property, const Prop
   if (!canBeSet(property, value)) {
     throw std::invalid_argument("property " + std::to_string(property) + " cannot be set to such a value");
   }
-  std::shared_ptr<const TreeSnapshot> source;
-  {
-    const std::lock_guard lock(lookMutex_);
-    lookAndRead();
-    source = sourceTree_;
-  }
+  const std::shared_ptr<const TreeSnapshot> source = lookAtSource();
   const Node* node = source->find(path);
   if (node == nullptr || node->type() != NodeType::NetworkIPConfig) {
     throw std::invalid_argument("no such node has an IP configuration");
@@ -172,9 +174,24 @@ bool Runtime::store(const std::string& path, PropertyNumber property, const Prop
   const bool same = own != nullptr && equalValues(own->value, value);
   overlay().set(path, property, same ? std::nullopt : std::optional<PropertyValue>(value));
   overlayHasChanged();
-  return true;
+  const std::string* interface = node->text(ZV::NodeLexicon::PROP_NAME);
+  return property == ZV::NodeLexicon::PROP_HOST_NAME || interface == nullptr || reachesHost(*interface);
 } catch (const std::exception& error) {
   ZORVAGENT_LOG_ERROR(path + ": the value is not stored: " + error.what());
+  return false;
+}
+
+// A process without the rights leaves it to the service that has them.
+bool Runtime::reachesHost(const std::string& interface) {
+  if (!CurrentConfig::instance().get().appliesToHost || ::geteuid() != 0) return true;
+  std::string problem;
+  try {
+    for (const ApplyResult& result : applySettings({interface})) problem = result.problem;
+  } catch (const std::exception& error) {
+    problem = error.what();
+  }
+  if (problem.empty()) return true;
+  ZORVAGENT_LOG_ERROR(interface + ": the value is stored, but not applied to the host: " + problem);
   return false;
 }
 

@@ -30,6 +30,9 @@ class Runtime {
   /// are logged, or a ConfigError.
   std::shared_ptr<const TreeSnapshot> look();
 
+  /// The tree of the source alone, without the values of the overlay. Throws as look() does.
+  std::shared_ptr<const TreeSnapshot> lookAtSource();
+
   /// The tree as of the last check; checks if there was none.
   std::shared_ptr<const TreeSnapshot> latest();
 
@@ -42,7 +45,8 @@ class Runtime {
   /// The system's name. Throws only std::bad_alloc.
   std::string systemName();
 
-  /// Stores a value of the node at that path in the overlay. False, with the reason in the log, if that fails.
+  /// Stores a value of the node at that path in the overlay. With [tree] apply = "host" and the rights of root, the
+  /// interface is applied to the host as well. False, with the reason in the log, if either fails.
   bool store(const std::string& path, PropertyNumber property, const PropertyValue& value);
 
   /// The overlay of the configured data directory. Throws ConfigError. The caller must announce a change with
@@ -57,6 +61,7 @@ class Runtime {
   Runtime();
 
   std::shared_ptr<const TreeSnapshot> lookAndRead();
+  static bool reachesHost(const std::string& interface);
   void reportOnce(const std::string& problem);
   void followFork();
   void forgetTree();

@@ -11,6 +11,8 @@ struct FileText {
   std::string text;        ///< the content, at most the limit
   bool truncated = false;  ///< the file is longer
   int error = 0;           ///< errno of the failure, 0 if there was none; EINVAL if it is not a regular file
+  unsigned int owner = 0;  ///< the user that the file belongs to
+  unsigned int mode = 0;   ///< its rights, as in stat(2)
 };
 
 /// Reads a file up to limit bytes. Symbolic links are followed. A file that is not regular is not read, so this never

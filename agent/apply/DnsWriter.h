@@ -11,8 +11,8 @@ namespace zorva::agent {
 
 /// The settings that are brought to an owner.
 struct DnsSettings {
-  StringList servers;   ///< addresses, in search order
-  StringList suffixes;  ///< the search list; the domain of the interface is its first
+  StringList servers;   ///< unicast addresses, in search order; a link-local one has the interface as its zone
+  StringList suffixes;  ///< the search list, of DNS names; the domain of the interface is its first
   bool operator==(const DnsSettings&) const = default;
 };
 
@@ -43,6 +43,10 @@ class DnsWriter {
   /// Makes these the settings of the interface, in place of those set by hand and those learned; persistently if the
   /// owner can. On failure the owner has what it had before.
   virtual Expected<void, Refusal> write(const DnsTarget& target, const DnsSettings& settings) = 0;
+
+  /// Called once where the owner does not show the settings a while after write() or restore(): does what else there
+  /// is.
+  virtual Expected<void, Refusal> insist(const DnsTarget&) { return {}; }
 
   /// Brings back what save() found, or what is learned (DHCP) where nothing was set by hand. Safe to repeat.
   virtual Expected<void, Refusal> restore(const DnsTarget& target, const std::string& saved) = 0;

@@ -51,8 +51,9 @@ void readTree(Config& config, const util::TomlDocument& document) {
 
   std::string apply = "overlay";
   tree.take("apply", apply);
-  if (apply == "host") tree.fail("apply", "\"host\" is not offered by this version; use \"overlay\"");
-  if (apply != "overlay") tree.fail("apply", "expected \"overlay\" or \"host\"");
+  if (apply != "overlay" && apply != "host") tree.fail("apply", "expected \"overlay\" or \"host\"");
+  config.appliesToHost = apply == "host";
+  if (config.appliesToHost && config.source != "host") tree.fail("apply", "\"host\" needs source = \"host\" as well");
   tree.finish();
 }
 

@@ -47,6 +47,7 @@ struct Config {
   std::string source = "host";  ///< or "file"
   std::string treeFile;         ///< the JSON document of source "file"
   bool includeLoopback = false;
+  bool appliesToHost = false;  ///< apply = "host": what is set is brought to the host, not only to the overlay
 
   /// [log]
   int logLevel = util::kLevelError;  ///< lines below it are dropped

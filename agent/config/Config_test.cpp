@@ -109,9 +109,12 @@ TEST_F(ConfigTest, AWrongValueIsNamedWithItsLine) {
             "agent.toml:2: log.target: expected \"stderr\", \"syslog\", \"off\" or a path");
 }
 
-TEST_F(ConfigTest, ApplyingToTheHostIsRefusedWhileItIsNotOffered) {
-  EXPECT_EQ(wrong("[tree]\napply = \"host\"\n"),
-            "agent.toml:2: tree.apply: \"host\" is not offered by this version; use \"overlay\"");
+TEST_F(ConfigTest, SettingsAreAppliedToTheHostOnlyWhereThatIsAskedFor) {
+  EXPECT_FALSE(read("").appliesToHost);
+  EXPECT_FALSE(read("[tree]\napply = \"overlay\"\n").appliesToHost);
+  EXPECT_TRUE(read("[tree]\napply = \"host\"\n").appliesToHost);
+  EXPECT_EQ(wrong("[tree]\nsource = \"file\"\nfile = \"tree.json\"\napply = \"host\"\n"),
+            "agent.toml:4: tree.apply: \"host\" needs source = \"host\" as well");
 }
 
 TEST_F(ConfigTest, WhatIsNoTomlIsNamedWithItsLine) {

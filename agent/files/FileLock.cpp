@@ -42,7 +42,7 @@ FileLock::FileLock(util::FileDescriptor file, const std::string& path, Mode mode
   while (::flock(file_.get(), operation) != 0) {
     if (errno != EWOULDBLOCK && errno != EINTR) util::throwFileError(path, "cannot be locked");
     if (std::chrono::steady_clock::now() > deadline) {
-      throw std::runtime_error(path + ": another process has held the lock for ten seconds");
+      throw std::runtime_error(path + ": another process has held the lock for too long");
     }
     std::this_thread::sleep_for(kPause);
   }

@@ -48,7 +48,10 @@ class DnsOwner {
   void askWhereStale(const std::vector<Link>& links);
 
   /// Whether there is nothing to wait for: all that was asked for is known, or the daemon has been waited for before.
-  bool isSettled() const { return late_ || (nameIsKnown_ && (owner_.empty() || (!stale_ && !asking_))); }
+  bool isSettled() const { return late_ || hasSaidAll(); }
+
+  /// Whether all that was asked for is known.
+  bool hasSaidAll() const { return nameIsKnown_ && (owner_.empty() || (!stale_ && !asking_)); }
 
   /// It has been waited for: isSettled() is true from now on until it answers.
   void giveUpWaiting() { late_ = true; }

@@ -84,13 +84,23 @@ bool DnsOwners::isSettled() const {
   return std::all_of(all_.begin(), all_.end(), [](const DnsOwner* owner) { return owner->isSettled(); });
 }
 
-void DnsOwners::giveUpWaiting() {
-  std::string late;
-  for (DnsOwner* owner : all_) {
-    if (owner->isSettled()) continue;
+// Of those for whom it is false.
+std::string DnsOwners::namesOf(bool (DnsOwner::*holds)() const) const {
+  std::string names;
+  for (const DnsOwner* owner : all_) {
+    if ((owner->*holds)()) continue;
     const std::string name = owner->nameIsKnown() ? owner->name() : "the message bus";
-    if (late.find(name) == std::string::npos) late += (late.empty() ? "" : ", ") + name;
-    owner->giveUpWaiting();
+    if (names.find(name) == std::string::npos) names += (names.empty() ? "" : ", ") + name;
+  }
+  return names;
+}
+
+std::string DnsOwners::whoIsLate() const { return bus_.isOpen() ? namesOf(&DnsOwner::hasSaidAll) : std::string(); }
+
+void DnsOwners::giveUpWaiting() {
+  const std::string late = namesOf(&DnsOwner::isSettled);
+  for (DnsOwner* owner : all_) {
+    if (!owner->isSettled()) owner->giveUpWaiting();
   }
   ZORVAGENT_LOG_ERROR("no answer within " + std::to_string(kLongestWait.count()) + " ms from " + late +
                       "; what was known before holds until it comes");

@@ -38,6 +38,9 @@ class DnsOwners {
 
   void reopen();
 
+  /// Who has not answered yet, in words; empty where nobody is missing, or where there is no bus.
+  std::string whoIsLate() const;
+
   /// What holds for a link, by the rules on the owner of an interface in docs/host.md; no lists where no owner has any.
   DnsFacts factsOf(const Link& link) const;
 
@@ -53,6 +56,7 @@ class DnsOwners {
   void disconnect();
   void handleArrived();
   bool isSettled() const;
+  std::string namesOf(bool (DnsOwner::*holds)() const) const;
   void giveUpWaiting();
 
   std::string socket_;

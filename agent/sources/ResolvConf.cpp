@@ -136,6 +136,30 @@ ResolvConf parseResolvConf(std::string_view text, std::string_view nodeName) {
   return conf;
 }
 
+std::string replaceInResolvConf(std::string_view text, const std::optional<StringList>& servers,
+                                const std::optional<StringList>& search) {
+  std::string serverLines;
+  for (const std::string& server : servers.value_or(StringList())) serverLines += "nameserver " + server + '\n';
+  std::string searchLine = search.has_value() ? "search" : "";
+  for (const std::string& name : search.value_or(StringList())) searchLine += ' ' + name;
+  if (search.has_value()) searchLine += search->empty() ? " .\n" : "\n";
+
+  std::string result;
+  while (!text.empty()) {
+    const std::string_view whole = text.substr(0, std::min(text.find('\n'), text.size() - 1) + 1);
+    const std::string_view line = takeLineOfResolver(text);
+    if (servers.has_value() && valueOf("nameserver", line)) {
+      result += std::exchange(serverLines, {});
+    } else if (search.has_value() && (valueOf("search", line) || valueOf("domain", line))) {
+      result += std::exchange(searchLine, {});
+    } else {
+      result += whole;
+    }
+  }
+  if (!result.empty() && !result.ends_with('\n') && !(searchLine + serverLines).empty()) result += '\n';
+  return result + searchLine + serverLines;
+}
+
 bool namesOnlyLocalStub(const ResolvConf& conf) {
   const auto isStub = [](const std::string& server) { return server == "127.0.0.53" || server == "127.0.0.54"; };
   return !conf.servers.empty() && std::all_of(conf.servers.begin(), conf.servers.end(), isStub);

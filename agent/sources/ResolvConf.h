@@ -2,6 +2,7 @@
 
 // What the host's resolver configuration says.
 
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -24,6 +25,12 @@ struct ResolvConf {
 
 /// nodeName is the kernel's name of the host.
 ResolvConf parseResolvConf(std::string_view text, std::string_view nodeName);
+
+/// The text with other servers, or with another search list, where they are given. The new lines are in the place of
+/// the first old one; all others stay. An empty search list is written as such, because without one the domain of the
+/// host's name would be searched.
+std::string replaceInResolvConf(std::string_view text, const std::optional<StringList>& servers,
+                                const std::optional<StringList>& search);
 
 /// True if the only server is the stub resolver of systemd-resolved. The servers that it asks are in a file of its own.
 bool namesOnlyLocalStub(const ResolvConf& conf);

@@ -1,0 +1,152 @@
+#include "agent/apply/AppliedState.h"
+
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <utility>
+
+#include "agent/config/Config.h"
+#include "agent/log/LogOutput.h"
+#include "agent/tree/Json.h"
+#include "util/ReadFile.h"
+#include "util/ReplaceFile.h"
+
+namespace zorva::agent {
+namespace {
+
+using Kind = JsonValue::Kind;
+
+constexpr const char* kFileName = "applied.json";
+
+// Reads a document whose every member is expected; throws ConfigError for any other shape.
+class StateReader {
+ public:
+  explicit StateReader(std::string document) : document_(std::move(document)) {}
+
+  AppliedState state(const JsonValue& value) const {
+    AppliedState state;
+    state.memory = memory(value);
+    if (value.find("trial") == nullptr) return state;
+    const JsonValue& trial = member(value, "trial", Kind::Object);
+    state.trial.emplace();
+    state.trial->until = member(trial, "until", Kind::Number).number;
+    state.trial->saved = saved(member(trial, "saved", Kind::List));
+    state.trial->before = memory(member(trial, "before", Kind::Object));
+    return state;
+  }
+
+ private:
+  AppliedMemory memory(const JsonValue& value) const {
+    AppliedMemory memory;
+    memory.first = saved(member(value, "first", Kind::List));
+    const JsonValue& domains = member(value, "added_domains", Kind::Object);
+    for (std::size_t i = 0; i < domains.keys.size(); ++i) {
+      memory.addedDomains.emplace(domains.keys[i], text(domains.items[i]));
+    }
+    return memory;
+  }
+
+  std::vector<SavedDns> saved(const JsonValue& list) const {
+    std::vector<SavedDns> result;
+    for (const JsonValue& item : list.items) {
+      const auto textOf = [&](const char* name) { return member(item, name, Kind::Text).text; };
+      SavedDns saved{textOf("interface"), textOf("owner"), textOf("profile"), textOf("saved"), {}};
+      saved.shown.lists = {texts(member(item, "servers", Kind::List)), texts(member(item, "suffixes", Kind::List))};
+      saved.shown.domain = textOf("domain");
+      result.push_back(std::move(saved));
+    }
+    return result;
+  }
+
+  const JsonValue& member(const JsonValue& object, const char* name, Kind kind) const {
+    const JsonValue* value = object.kind == Kind::Object ? object.find(name) : nullptr;
+    if (value == nullptr || value->kind != kind) throw ConfigError(document_, object.line, name, "is missing or wrong");
+    return *value;
+  }
+
+  std::string text(const JsonValue& value) const {
+    if (value.kind != Kind::Text) throw ConfigError(document_, value.line, {}, "expected a text");
+    return value.text;
+  }
+
+  StringList texts(const JsonValue& list) const {
+    StringList result;
+    for (const JsonValue& item : list.items) result.push_back(text(item));
+    return result;
+  }
+
+  std::string document_;
+};
+
+JsonValue listOf(const StringList& texts) {
+  JsonValue list = JsonValue::list();
+  for (const std::string& text : texts) list.add(JsonValue::ofText(text));
+  return list;
+}
+
+JsonValue listOf(const std::vector<SavedDns>& all) {
+  JsonValue list = JsonValue::list();
+  for (const SavedDns& saved : all) {
+    JsonValue item = JsonValue::object();
+    item.add("interface", JsonValue::ofText(saved.interface));
+    item.add("owner", JsonValue::ofText(saved.owner));
+    item.add("profile", JsonValue::ofText(saved.profile));
+    item.add("saved", JsonValue::ofText(saved.saved));
+    item.add("servers", listOf(saved.shown.lists.servers));
+    item.add("suffixes", listOf(saved.shown.lists.suffixes));
+    item.add("domain", JsonValue::ofText(saved.shown.domain));
+    list.add(std::move(item));
+  }
+  return list;
+}
+
+JsonValue objectOf(const AppliedMemory& memory) {
+  JsonValue object = JsonValue::object();
+  object.add("first", listOf(memory.first));
+  JsonValue domains = JsonValue::object();
+  for (const auto& [interface, domain] : memory.addedDomains) domains.add(interface, JsonValue::ofText(domain));
+  object.add("added_domains", std::move(domains));
+  return object;
+}
+
+}  // namespace
+
+const SavedDns* AppliedMemory::find(const std::string& interface, const std::string& owner,
+                                    const std::string& profile) const {
+  const auto found = std::find_if(first.begin(), first.end(), [&](const SavedDns& saved) {
+    return saved.interface == interface && saved.owner == owner && saved.profile == profile;
+  });
+  return found == first.end() ? nullptr : &*found;
+}
+
+AppliedState AppliedStateFile::read() const {
+  const std::string path = directory_ + kFileName;
+  const util::FileText file = util::readFile(path, kLargestJson);
+  if (file.error == ENOENT) return {};
+  if (file.error != 0) throw ConfigError(path, 0, {}, "cannot be read: " + util::fileErrorText(file.error));
+  if (file.owner != 0 && file.owner != ::geteuid()) {
+    throw ConfigError(path, 0, {}, "belongs to user " + std::to_string(file.owner) + " and is not trusted; remove it");
+  }
+  if ((file.mode & (S_IWGRP | S_IWOTH)) != 0) {
+    throw ConfigError(path, 0, {}, "can be written by other users and is not trusted; remove it");
+  }
+  if (file.truncated) throw ConfigError(path, 0, {}, "is larger than 64 MiB");
+  return StateReader(path).state(parseJson(file.text, path));
+}
+
+void AppliedStateFile::write(const AppliedState& state) const {
+  JsonValue document = objectOf(state.memory);
+  if (state.trial.has_value()) {
+    JsonValue trial = JsonValue::object();
+    trial.add("until", JsonValue::ofNumber(state.trial->until));
+    trial.add("saved", listOf(state.trial->saved));
+    trial.add("before", objectOf(state.trial->before));
+    document.add("trial", std::move(trial));
+  }
+  const std::string unsynced = util::replaceFile(directory_, kFileName, formatJson(document));
+  if (!unsynced.empty()) ZORVAGENT_LOG_ERROR(unsynced);
+}
+
+}  // namespace zorva::agent

@@ -1,0 +1,441 @@
+#include "agent/apply/Applier.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <memory>
+#include <stdexcept>
+#include <utility>
+
+#include "agent/files/FileLock.h"
+#include "agent/log/LogOutput.h"
+#include "agent/tree/TreeJson.h"
+#include "util/Escape.h"
+#include "util/FileError.h"
+#include "util/Names.h"
+
+namespace zorva::agent {
+namespace {
+
+using namespace ZV::NodeLexicon;
+using std::chrono::system_clock;
+
+constexpr const char* kLockName = "applied.lock";
+constexpr const char* kNetworkdOwner = "systemd-networkd";
+
+std::unique_ptr<FileLock> lockOf(const std::string& dataDir) {
+  constexpr std::chrono::seconds kLongest{30};
+  constexpr mode_t kRights = 0600;
+  const std::string path = dataDir + kLockName;
+  util::FileDescriptor file = openLockFile(path, kRights);
+  if (!file) util::throwFileError(path, "cannot be opened");
+  return std::make_unique<FileLock>(std::move(file), path, FileLock::Mode::Exclusive,
+                                    std::chrono::steady_clock::now() + kLongest);
+}
+
+StringList listOfText(const std::string& text) { return text.empty() ? StringList() : StringList{text}; }
+
+std::vector<PropertyChange> differences(const ShownDns& before, const ShownDns& after) {
+  std::vector<PropertyChange> changes;
+  const auto compare = [&changes](PropertyNumber property, const StringList& left, const StringList& right) {
+    if (!sameLists({left, {}}, {right, {}})) changes.push_back({propertyName(property), left, right});
+  };
+  compare(PROP_DNS_SERVER_ADDRESSES, before.lists.servers, after.lists.servers);
+  compare(PROP_DNS_SUFFIXES, before.lists.suffixes, after.lists.suffixes);
+  compare(PROP_DOMAIN_NAME, listOfText(before.domain), listOfText(after.domain));
+  return changes;
+}
+
+std::string joined(const StringList& words, const char* between = ", ") {
+  std::string text;
+  for (const std::string& word : words) text += (text.empty() ? "" : between) + word;
+  return text;
+}
+
+std::string inOneLine(const std::string& text) {
+  std::string line;
+  util::appendEscaped(line, text);
+  return line;
+}
+
+bool hasDnsSettings(const OverlayValues& overlay, const std::string& path) {
+  const auto node = overlay.find(path);
+  if (node == overlay.end()) return false;
+  return std::any_of(node->second.begin(), node->second.end(),
+                     [](const auto& property) { return property.first != PROP_HOST_NAME; });
+}
+
+std::uint64_t secondsOf(system_clock::time_point time) {
+  return static_cast<std::uint64_t>(std::chrono::duration_cast<std::chrono::seconds>(time.time_since_epoch()).count());
+}
+
+}  // namespace
+
+Applier::Applier(const std::string& dataDir, HostDns::Look look)
+    : dataDir_(dataDir), file_(dataDir), host_(std::move(look)) {}
+
+std::vector<ApplyResult> Applier::apply(const std::vector<std::string>& names, const OverlayValues& overlay,
+                                        const ApplyOptions& options) {
+  const auto lock = options.dryRun ? nullptr : lockOf(dataDir_);
+  host_.look();
+  readState(!options.dryRun);
+  std::vector<Plan> plans;
+  const auto hasSettings = [&](const HostInterface& interface) {
+    return ::access(settingsFileOf(dataDir_, interface.name).c_str(), F_OK) == 0 ||
+           hasDnsSettings(overlay, interface.path);
+  };
+  for (const HostInterface& interface : choose(names, hasSettings)) plans.push_back(planFor(interface, overlay));
+  refuseSharedStores(plans);
+  if (!options.dryRun && options.trial.has_value()) {
+    std::vector<SavedDns> saved;
+    for (const Plan& plan : plans) {
+      if (plan.mustWrite()) saved.push_back(plan.savedDns());
+    }
+    beginTrial(std::move(saved), *options.trial);
+  }
+  std::vector<ApplyResult> results;
+  for (Plan& plan : plans) {
+    if (!options.dryRun && plan.mustWrite()) execute(plan);
+    results.push_back(std::move(plan.result));
+  }
+  return results;
+}
+
+// Names that are in no tree come first. Without names those that are meant.
+std::vector<HostInterface> Applier::choose(const std::vector<std::string>& names,
+                                           const std::function<bool(const HostInterface&)>& isMeant) const {
+  const auto isNamed = [&](const std::string& name) {
+    return std::find(names.begin(), names.end(), name) != names.end();
+  };
+  std::vector<HostInterface> chosen;
+  for (const std::string& name : names) {
+    HostInterface interface = host_.interface(name);
+    const auto isSame = [&](const HostInterface& other) { return other.name == name; };
+    if (interface.path.empty() && std::none_of(chosen.begin(), chosen.end(), isSame)) {
+      chosen.push_back(std::move(interface));
+    }
+  }
+  for (HostInterface& interface : host_.interfaces()) {
+    if (names.empty() ? isMeant(interface) : isNamed(interface.name)) chosen.push_back(std::move(interface));
+  }
+  return chosen;
+}
+
+Applier::Plan Applier::planFor(const HostInterface& interface, const OverlayValues& overlay) {
+  Plan plan;
+  plan.interface = interface;
+  plan.result.interface = interface.name;
+  if (!interface.exists()) {
+    plan.result.problem = "there is no interface " + inOneLine(interface.name);
+    return plan;
+  }
+  const auto read = readWanted(dataDir_, interface.name, overlay, interface.path);
+  if (!read) {
+    plan.result.problem = read.error();
+    return plan;
+  }
+  const auto wanted = checked(*read, interface.name);
+  if (!wanted) {
+    plan.result.problem = wanted.error();
+    return plan;
+  }
+  planOwner(plan);
+  if (!plan.result.problem.empty()) return plan;
+  plan.hasSettings = wanted->any();
+  if (plan.hasSettings) {
+    planSettings(plan, *wanted);
+  } else {
+    plan.result.note = "no DNS settings are stored for it";
+  }
+  return plan;
+}
+
+void Applier::planOwner(Plan& plan) {
+  const auto owner = host_.ownerOf(plan.interface);
+  if (!owner) {
+    plan.result.problem = owner.error();
+    return;
+  }
+  plan.result.owner = owner->name;
+  plan.result.profile = owner->profile;
+  plan.target = host_.targetFor(plan.interface, owner->profile);
+  if (host_.writerOf(owner->name) == nullptr) {
+    plan.result.problem = owner->name + " owns " + plan.interface.name + " and cannot be changed from here";
+  }
+}
+
+void Applier::planSettings(Plan& plan, const WantedSettings& wanted) {
+  const std::string& owner = plan.result.owner;
+  DnsWriter& writer = *host_.writerOf(owner);
+  plan.before = host_.shown(plan.interface, owner);
+  plan.settings = plan.before.lists;
+  if (wanted.servers.has_value()) plan.settings.servers = *wanted.servers;
+
+  StringList& suffixes = plan.settings.suffixes;
+  const auto added = state_.memory.addedDomains.find(plan.interface.name);
+  const bool hasAdded =
+      added != state_.memory.addedDomains.end() && !suffixes.empty() && util::sameName(suffixes.front(), added->second);
+  if (wanted.suffixes.has_value() || wanted.domain.has_value()) {
+    if (wanted.suffixes.has_value()) {
+      suffixes = *wanted.suffixes;
+    } else if (hasAdded) {
+      suffixes.erase(suffixes.begin());
+    }
+    const std::string ownDomain = owner == kResolvConfOwner ? std::string() : host_.ownDomain();
+    const StringList list = searchListOf(suffixes, wanted.domain.value_or(""), ownDomain);
+    if (list.size() > suffixes.size()) plan.addedDomain = list.front();
+    suffixes = list;
+  } else if (hasAdded) {
+    plan.addedDomain = added->second;
+  }
+
+  plan.after.lists = writer.asHeld(plan.settings);
+  if (sameLists(plan.after.lists, writer.asHeld(plan.before.lists))) return;
+  const StringList& names = plan.after.lists.suffixes;
+  if (owner != kResolvConfOwner) plan.after.domain = names.empty() ? host_.ownDomain() : names.front();
+  plan.result.changes = differences(plan.before, plan.after);
+  const auto saved = writer.save(plan.target);
+  if (saved) {
+    plan.saved = *saved;
+  } else {
+    plan.result.problem = saved.error();
+  }
+}
+
+// A file of several interfaces has one list for all of them.
+void Applier::refuseSharedStores(std::vector<Plan>& plans) const {
+  for (Plan& plan : plans) {
+    const std::string& owner = plan.result.owner;
+    if (!plan.mustWrite() || (owner != kResolvConfOwner && owner != kNetworkdOwner)) continue;
+    StringList others;
+    if (owner == kNetworkdOwner) others = host_.othersWith({owner, plan.result.profile}, plan.interface);
+    for (const Plan& other : plans) {
+      const bool shares = &other != &plan && other.result.owner == owner && other.result.profile == plan.result.profile;
+      if (!shares || !other.hasSettings) continue;
+      std::erase(others, other.interface.name);
+      if (!sameLists(other.settings, plan.settings)) others.push_back(other.interface.name);
+    }
+    if (others.empty()) continue;
+    plan.result.problem = owner == kResolvConfOwner
+                              ? owner + " is that of the whole host, and " + plan.interface.name +
+                                    " has other settings than " + joined(others) + "; apply one of them by its name"
+                              : plan.result.profile + " is the file of " + joined(others) + " too; give " +
+                                    plan.interface.name + " a file of its own in /etc/systemd/network";
+  }
+}
+
+// The state from before is on the disk before the owner is touched.
+void Applier::execute(Plan& plan) {
+  const AppliedMemory before = state_.memory;
+  DnsWriter& writer = *host_.writerOf(plan.result.owner);
+  remember(plan);
+  file_.write(state_);
+  const auto written = writer.write(plan.target, plan.settings);
+  if (written && host_.waitUntilShown(plan.target, plan.result.owner, plan.after.lists)) {
+    plan.result.note = writer.note();
+    return;
+  }
+  plan.result.changes.clear();
+  plan.result.problem = written ? notTaken(plan) : written.error();
+  if (written) {
+    const auto restored = writer.restore(plan.target, plan.saved);
+    if (!restored) {
+      plan.result.problem += "; and " + plan.interface.name + " could not be put back: " + restored.error();
+      return;
+    }
+    plan.result.problem += "; " + plan.interface.name + " is as it was before";
+  }
+  state_.memory = before;
+  file_.write(state_);
+}
+
+// What is host-wide was saved at the first change for any interface.
+void Applier::remember(const Plan& plan) {
+  AppliedMemory& memory = state_.memory;
+  if (memory.find(plan.interface.name, plan.result.owner, plan.result.profile) == nullptr) {
+    SavedDns saved = plan.savedDns();
+    for (const SavedDns& other : memory.first) {
+      if (other.owner != kResolvConfOwner || saved.owner != kResolvConfOwner) continue;
+      saved.saved = other.saved;
+      saved.shown = other.shown;
+    }
+    memory.first.push_back(std::move(saved));
+  }
+  memory.addedDomains.erase(plan.interface.name);
+  if (!plan.addedDomain.empty()) memory.addedDomains[plan.interface.name] = plan.addedDomain;
+}
+
+std::string Applier::notTaken(const Plan& plan) {
+  const ShownDns shown = host_.shown(plan.interface, plan.result.owner);
+  ShownDns wanted = plan.after;
+  wanted.domain = shown.domain;
+  std::string problem = plan.result.owner + " did not take";
+  for (const PropertyChange& change : differences(shown, wanted)) {
+    problem += (problem.ends_with(')') ? ", " : " ") + change.property + " (it has " +
+               (change.before.empty() ? "none" : joined(change.before)) + ", not " +
+               (change.after.empty() ? "none" : joined(change.after)) + ")";
+  }
+  return problem;
+}
+
+std::vector<ApplyResult> Applier::revert(const std::vector<std::string>& names, const ApplyOptions& options) {
+  const auto lock = options.dryRun ? nullptr : lockOf(dataDir_);
+  host_.look();
+  readState(!options.dryRun);
+  StringList meant = names;
+  if (names.empty()) {
+    for (const SavedDns& entry : state_.memory.first) meant.push_back(entry.interface);
+  }
+  if (meant.empty()) return {};
+  const std::vector<HostInterface> chosen = choose(meant, [](const HostInterface&) { return false; });
+  if (!options.dryRun && options.trial.has_value()) {
+    std::vector<SavedDns> saved;
+    for (const HostInterface& interface : chosen) {
+      for (const SavedDns& entry : entriesOf(interface.name)) saved.push_back(saveNow(entry));
+    }
+    beginTrial(std::move(saved), *options.trial);
+  }
+  std::vector<ApplyResult> results;
+  for (const HostInterface& interface : chosen) results.push_back(revertOne(interface, options.dryRun));
+  return results;
+}
+
+std::vector<SavedDns> Applier::entriesOf(const std::string& interface) const {
+  std::vector<SavedDns> entries;
+  for (const SavedDns& entry : state_.memory.first) {
+    if (entry.interface == interface) entries.push_back(entry);
+  }
+  return entries;
+}
+
+// An interface has an entry for each owner that was changed for it.
+ApplyResult Applier::revertOne(const HostInterface& interface, bool dryRun) {
+  ApplyResult result;
+  result.interface = interface.name;
+  const std::vector<SavedDns> entries = entriesOf(interface.name);
+  if (entries.empty() && !interface.exists()) result.problem = "there is no interface " + inOneLine(interface.name);
+  for (const SavedDns& entry : entries) {
+    const ApplyResult one = restore(entry, dryRun);
+    result.owner = one.owner;
+    result.profile = one.profile;
+    result.changes.insert(result.changes.end(), one.changes.begin(), one.changes.end());
+    if (!one.problem.empty()) result.problem += (result.problem.empty() ? "" : "; ") + one.problem;
+    if (dryRun || !one.problem.empty()) continue;
+    forget(entry);
+    file_.write(state_);
+  }
+  return result;
+}
+
+void Applier::forget(const SavedDns& saved) {
+  std::erase_if(state_.memory.first, [&](const SavedDns& other) {
+    const bool isSame = other.interface == saved.interface && other.profile == saved.profile;
+    return other.owner == saved.owner && (isSame || other.owner == kResolvConfOwner);
+  });
+  state_.memory.addedDomains.erase(saved.interface);
+}
+
+ApplyResult Applier::restore(const SavedDns& saved, bool dryRun) {
+  ApplyResult result;
+  result.interface = saved.interface;
+  result.owner = saved.owner;
+  result.profile = saved.profile;
+  const HostInterface interface = host_.interface(saved.interface);
+  const DnsTarget target = host_.targetFor(interface, saved.profile);
+  DnsWriter* writer = host_.writerOf(saved.owner);
+  if (writer == nullptr) {
+    result.problem = inOneLine(saved.owner) + " had " + saved.interface + " and cannot be changed from here";
+    return result;
+  }
+  const ShownDns before = host_.shown(interface, saved.owner);
+  if (dryRun) {
+    result.changes = differences(before, saved.shown);
+    return result;
+  }
+  if (const auto restored = writer->restore(target, saved.saved); !restored) {
+    result.problem = restored.error();
+    return result;
+  }
+  if (!interface.exists()) return result;
+  // What is learned may be another list by now.
+  const bool isShown = host_.waitUntilShown(target, saved.owner, saved.shown.lists);
+  const ShownDns after = host_.shown(interface, saved.owner);
+  result.changes = differences(before, after);
+  if (!isShown && before == after) result.problem = saved.owner + " still has the settings of before";
+  return result;
+}
+
+SavedDns Applier::saveNow(const SavedDns& entry) {
+  SavedDns now = entry;
+  const HostInterface interface = host_.interface(entry.interface);
+  DnsWriter* writer = host_.writerOf(entry.owner);
+  if (writer == nullptr) throw std::runtime_error(inOneLine(entry.owner) + " cannot be changed from here");
+  const auto saved = writer->save(host_.targetFor(interface, entry.profile));
+  if (!saved) throw std::runtime_error(entry.interface + ": " + saved.error());
+  now.saved = *saved;
+  now.shown = host_.shown(interface, entry.owner);
+  return now;
+}
+
+// Before a change a trial that ran out is taken back. One that runs would lose what it is to bring back.
+void Applier::readState(bool mayChange) {
+  state_ = file_.read();
+  if (!mayChange || !state_.trial.has_value()) return;
+  if (state_.trial->until > secondsOf(system_clock::now())) {
+    throw std::runtime_error("a trial has not been confirmed; confirm it, or wait until it ends");
+  }
+  for (const ApplyResult& result : takeBackTrial()) {
+    ZORVAGENT_LOG_ERROR(result.interface + ": a trial ended without a confirmation and is taken back" +
+                        (result.problem.empty() ? "" : ": " + result.problem));
+  }
+  host_.look();
+}
+
+void Applier::beginTrial(std::vector<SavedDns> saved, std::chrono::seconds length) {
+  if (saved.empty()) return;
+  state_.trial = AppliedState::Trial{secondsOf(system_clock::now() + length), std::move(saved), state_.memory};
+  file_.write(state_);
+}
+
+// What cannot be taken back now stays, for the next attempt.
+std::vector<ApplyResult> Applier::takeBackTrial() {
+  std::vector<ApplyResult> results;
+  std::vector<SavedDns> left;
+  for (const SavedDns& saved : state_.trial->saved) {
+    results.push_back(restore(saved, false));
+    if (!results.back().problem.empty()) left.push_back(saved);
+  }
+  if (left.empty()) {
+    state_.memory = state_.trial->before;
+    state_.trial.reset();
+  } else {
+    state_.trial->saved = std::move(left);
+  }
+  file_.write(state_);
+  return results;
+}
+
+std::vector<ApplyResult> Applier::endTrial() {
+  const auto lock = lockOf(dataDir_);
+  state_ = file_.read();
+  if (!state_.trial.has_value()) return {};
+  host_.look();
+  return takeBackTrial();
+}
+
+std::optional<system_clock::time_point> pendingTrialIn(const std::string& dataDir) {
+  const AppliedState state = AppliedStateFile(dataDir).read();
+  if (!state.trial.has_value()) return std::nullopt;
+  return system_clock::time_point(std::chrono::seconds(state.trial->until));
+}
+
+void confirmTrialIn(const std::string& dataDir) {
+  const auto lock = lockOf(dataDir);
+  const AppliedStateFile file(dataDir);
+  AppliedState state = file.read();
+  if (!state.trial.has_value()) return;
+  state.trial.reset();
+  file.write(state);
+}
+
+}  // namespace zorva::agent

@@ -1,0 +1,141 @@
+#include "agent/apply/HostDns.h"
+
+#include <algorithm>
+#include <thread>
+#include <utility>
+
+#include "agent/apply/Writers.h"
+#include "agent/sources/HostNames.h"
+#include "util/HostName.h"
+#include "util/Names.h"
+#include "util/ReadFile.h"
+
+namespace zorva::agent {
+namespace {
+
+using namespace ZV::NodeLexicon;
+using std::chrono::steady_clock;
+
+constexpr const char* kRoot = "";  // of all paths
+constexpr const char* kBusSocket = "/run/dbus/system_bus_socket";
+constexpr std::size_t kLargestHosts = std::size_t{64} << 10;
+
+StringList listOf(const Node& node, PropertyNumber number) {
+  const StringList* list = node.list(number);
+  return list == nullptr ? StringList() : *list;
+}
+
+std::string textOf(const Node& node, PropertyNumber number) {
+  const std::string* text = node.text(number);
+  return text == nullptr ? std::string() : *text;
+}
+
+bool sameNames(const StringList& left, const StringList& right) {
+  return std::equal(left.begin(), left.end(), right.begin(), right.end(), util::sameName);
+}
+
+}  // namespace
+
+bool sameLists(const DnsSettings& left, const DnsSettings& right) {
+  return sameNames(left.servers, right.servers) && sameNames(left.suffixes, right.suffixes);
+}
+
+HostDns::HostDns(Look look) : look_(std::move(look)), bus_(kBusSocket), choice_(bus_, kRoot) {}
+
+void HostDns::look() {
+  links_ = reader_.read().links;
+  choice_.look(links_);
+  tree_ = look_();
+}
+
+std::vector<HostInterface> HostDns::interfaces() const {
+  std::vector<HostInterface> interfaces;
+  for (const Node& node : tree_->nodes()) {
+    if (node.type() != NodeType::NetworkIPConfig) continue;
+    HostInterface found{textOf(node, PROP_NAME), node.path(), {}};
+    for (const Link& link : links_) {
+      if (link.name == found.name) found.link = link;
+    }
+    interfaces.push_back(std::move(found));
+  }
+  return interfaces;
+}
+
+// The tree may lack the loopback interface.
+HostInterface HostDns::interface(const std::string& name) const {
+  for (HostInterface& interface : interfaces()) {
+    if (interface.name == name) return std::move(interface);
+  }
+  for (const Link& link : links_) {
+    if (link.name == name) return {name, {}, link};
+  }
+  return {name, {}, {}};
+}
+
+std::vector<std::string> HostDns::othersWith(const ChosenOwner& owner, const HostInterface& interface) const {
+  return choice_.othersWith(owner, interface.link);
+}
+
+DnsWriter* HostDns::writerOf(const std::string& owner) {
+  std::unique_ptr<DnsWriter>& writer = writers_[owner];
+  if (writer == nullptr) writer = makeWriter(owner, bus_, kRoot);
+  return writer.get();
+}
+
+const Node* HostDns::nodeOf(const HostInterface& interface) const {
+  return interface.path.empty() ? nullptr : tree_->find(interface.path);
+}
+
+DnsTarget HostDns::targetFor(const HostInterface& interface, const std::string& profile) const {
+  DnsTarget target{interface.name, interface.link.index, profile, {}, {}};
+  const Node* node = nodeOf(interface);
+  if (node == nullptr) return target;
+  target.serversInFull = listOf(*node, kDnsServersInFull);
+  target.routingDomains = listOf(*node, kDnsRoutingDomains);
+  return target;
+}
+
+ShownDns HostDns::shown(const HostInterface& interface, const std::string& owner) const {
+  ShownDns shown;
+  const Node* node = nodeOf(interface);
+  if (node == nullptr || textOf(*node, kDnsOwner) != owner) {
+    if (owner != kResolvConfOwner) shown.domain = ownDomain();
+    return shown;
+  }
+  shown.lists = {listOf(*node, PROP_DNS_SERVER_ADDRESSES), listOf(*node, PROP_DNS_SUFFIXES)};
+  if (owner != kResolvConfOwner) {
+    shown.domain = textOf(*node, PROP_DOMAIN_NAME);
+    return shown;
+  }
+  // The servers that the C library passes over are in the file as well.
+  const StringList more = listOf(tree_->parent(tree_->parent(*node)), kResolverNotAsked);
+  shown.lists.servers.insert(shown.lists.servers.end(), more.begin(), more.end());
+  return shown;
+}
+
+std::string HostDns::ownDomain() const {
+  const util::FileText hosts = util::readFile("/etc/hosts", kLargestHosts);
+  return findHostNames(util::kernelHostName(), hosts.text, {}).domain;
+}
+
+bool HostDns::waitUntilShown(const DnsTarget& target, const std::string& owner, const DnsSettings& lists) {
+  constexpr std::chrono::seconds kLongest{5};
+  constexpr std::chrono::seconds kUntilInsisting{1};
+  constexpr std::chrono::milliseconds kPause{20};
+  const auto start = steady_clock::now();
+  const HostInterface interface = this->interface(target.interface);
+  bool insisted = false;
+  for (;;) {
+    tree_ = look_();
+    if (sameLists(shown(interface, owner).lists, lists)) return true;
+    const auto waited = steady_clock::now() - start;
+    if (waited > kLongest) return false;
+    if (waited > kUntilInsisting && !insisted) {
+      insisted = true;
+      if (const auto done = writerOf(owner)->insist(target); !done) return false;
+    }
+    std::this_thread::sleep_for(kPause);
+  }
+}
+
+}  // namespace zorva::agent

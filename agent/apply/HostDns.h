@@ -1,0 +1,82 @@
+#pragma once
+
+// The DNS settings of the host as the tree shows them, and the writers that change them.
+
+#include <chrono>
+#include <functional>
+#include <map>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "agent/apply/AppliedState.h"
+#include "agent/apply/BusCalls.h"
+#include "agent/apply/DnsWriter.h"
+#include "agent/apply/OwnerChoice.h"
+#include "agent/sources/Netlink.h"
+#include "agent/tree/TreeSnapshot.h"
+
+namespace zorva::agent {
+
+inline constexpr const char* kResolvConfOwner = "/etc/resolv.conf";
+
+/// An interface of the host, or a name that is none.
+struct HostInterface {
+  std::string name;
+  std::string path;  ///< of its node in the tree; empty where it has none
+  Link link;         ///< index 0 where the kernel has none
+
+  bool exists() const { return link.index != 0; }
+};
+
+/// Belongs to one thread.
+class HostDns {
+ public:
+  /// The tree of the host, without the values of the overlay, as it is now.
+  using Look = std::function<std::shared_ptr<const TreeSnapshot>()>;
+
+  explicit HostDns(Look look);
+
+  /// Reads the tree and asks the owners. To be called before all else; what the owners say is as of this call.
+  void look();
+
+  /// Those of the tree, in its order.
+  std::vector<HostInterface> interfaces() const;
+  HostInterface interface(const std::string& name) const;
+
+  Expected<ChosenOwner, Refusal> ownerOf(const HostInterface& interface) { return choice_.choose(interface.link); }
+
+  /// The other interfaces that would be changed as well.
+  std::vector<std::string> othersWith(const ChosenOwner& owner, const HostInterface& interface) const;
+
+  /// Null where this owner cannot be changed.
+  DnsWriter* writerOf(const std::string& owner);
+
+  DnsTarget targetFor(const HostInterface& interface, const std::string& profile) const;
+
+  /// What the tree shows of the interface as this owner's; nothing where the tree has its lists from another one.
+  ShownDns shown(const HostInterface& interface, const std::string& owner) const;
+
+  /// The domain of an interface whose owner names none.
+  std::string ownDomain() const;
+
+  /// Reads the tree until it shows these lists as the owner's. False where it does not for five seconds. The owner is
+  /// asked to insist once meanwhile.
+  bool waitUntilShown(const DnsTarget& target, const std::string& owner, const DnsSettings& lists);
+
+ private:
+  const Node* nodeOf(const HostInterface& interface) const;
+
+  Look look_;
+  BusCalls bus_;
+  OwnerChoice choice_;
+  LinkReader reader_;
+  std::shared_ptr<const TreeSnapshot> tree_;
+  std::vector<Link> links_;
+  std::map<std::string, std::unique_ptr<DnsWriter>> writers_;
+};
+
+/// Whether two lists are the same, names in any case.
+bool sameLists(const DnsSettings& left, const DnsSettings& right);
+
+}  // namespace zorva::agent
