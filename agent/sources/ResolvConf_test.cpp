@@ -2,24 +2,23 @@
 
 #include <arpa/inet.h>
 #include <gtest/gtest.h>
-#include <netdb.h>
-#include <poll.h>
 #include <resolv.h>
-#include <sys/socket.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <array>
 #include <vector>
 
+#include "agent/testing/DnsListeners.h"
 #include "agent/testing/NetworkNamespace.h"
 #include "agent/testing/PrivateHostTest.h"
 #include "agent/testing/TemporaryDirectory.h"
 #include "agent/tree/IpAddress.h"
-#include "util/FileDescriptor.h"
 
 namespace zorva::agent {
 namespace {
+
+using testing::DnsListeners;
 
 constexpr const char* kHost = "host1";
 
@@ -208,81 +207,6 @@ TEST(ResolvConf, TheCLibraryMakesTheSameOfEachFile) {
   }));
 }
 
-// Servers that refuse every question with one code, and remember who was asked for what.
-class Listeners {
- public:
-  Listeners(const StringList& addresses, unsigned char code) : addresses_(addresses), code_(code) {
-    for (const std::string& address : addresses) {
-      util::FileDescriptor socket(::socket(AF_INET, SOCK_DGRAM | SOCK_CLOEXEC, 0));
-      sockaddr_in place{};
-      place.sin_family = AF_INET;
-      place.sin_port = htons(53);
-      ::inet_pton(AF_INET, address.c_str(), &place.sin_addr);
-      if (::bind(socket.get(), reinterpret_cast<sockaddr*>(&place), sizeof place) != 0) {
-        throw std::runtime_error("cannot listen on " + address);
-      }
-      sockets_.push_back(std::move(socket));
-    }
-  }
-
-  // Looks a name up in another process, and answers until that is done.
-  void lookUp(const std::string& name) {
-    const pid_t child = testing::startChild([&name] {
-      addrinfo hints{};
-      hints.ai_family = AF_INET;
-      addrinfo* found = nullptr;
-      return ::getaddrinfo(name.c_str(), nullptr, &hints, &found) != 0;
-    });
-    while (::waitpid(child, nullptr, WNOHANG) == 0) answer();
-  }
-
-  StringList asked;  // servers in the order in which they were asked first
-  StringList names;  // that were asked for, likewise
-
- private:
-  static void addNew(StringList& list, const std::string& value) {
-    if (std::find(list.begin(), list.end(), value) == list.end()) list.push_back(value);
-  }
-
-  void answer() {
-    std::vector<pollfd> waits;
-    for (const util::FileDescriptor& socket : sockets_) waits.push_back({socket.get(), POLLIN, 0});
-    ::poll(waits.data(), waits.size(), 10);
-    for (std::size_t i = 0; i < waits.size(); ++i) {
-      if ((waits[i].revents & POLLIN) != 0) answer(i);
-    }
-  }
-
-  void answer(std::size_t server) {
-    constexpr std::size_t kHeader = 12;
-    constexpr unsigned char kIsAnswer = 0x80;
-    std::array<unsigned char, 512> message{};
-    sockaddr_in from{};
-    socklen_t size = sizeof from;
-    const int socket = sockets_[server].get();
-    auto* peer = reinterpret_cast<sockaddr*>(&from);
-    const ssize_t got = ::recvfrom(socket, message.data(), message.size(), 0, peer, &size);
-    if (got <= static_cast<ssize_t>(kHeader)) return;
-    std::string name;
-    for (std::size_t at = kHeader; message[at] != 0; at += message[at] + 1U) {
-      const auto* label = reinterpret_cast<const char*>(&message[at + 1]);
-      name += std::string(name.empty() ? "" : ".") + std::string(label, message[at]);
-    }
-    addNew(asked, addresses_[server]);
-    addNew(names, name);
-    message[2] |= kIsAnswer;
-    message[3] = code_;
-    ::sendto(socket, message.data(), static_cast<std::size_t>(got), 0, peer, size);
-  }
-
-  StringList addresses_;
-  unsigned char code_;
-  std::vector<util::FileDescriptor> sockets_;
-};
-
-constexpr unsigned char kServerFailure = 2;  // the next server is asked
-constexpr unsigned char kNoSuchName = 3;     // the next suffix is tried
-
 bool resolverAsksWhoIsShown() {
   const StringList hosts{"192.0.2.1", "192.0.2.2", "192.0.2.3", "192.0.2.4"};
   testing::Interfaces interfaces;
@@ -294,7 +218,7 @@ bool resolverAsksWhoIsShown() {
        {"nameserver 192.0.2.4\nnameserver 192.0.2.2\nnameserver 192.0.2.1\nnameserver 192.0.2.3\n", "",
         "nameserver 127.0.72\n", "nameserver 192.0.2.1\r\nnameserver 192.0.2.2\n"}) {
     testing::writeFile("/etc/resolv.conf", file);
-    Listeners listeners(addresses, kServerFailure);
+    DnsListeners listeners(addresses, DnsListeners::kServerFailure);
     listeners.lookUp("name.example.");
     EXPECT_EQ(listeners.asked, serversIn(file)) << file;
   }
@@ -313,7 +237,7 @@ bool resolverTriesTheSuffixesThatAreShown() {
   for (const std::string file : {"", "search a.org b.org\n", "domain c.org\n", "search a.org\ndomain c.org d.org\n",
                                  "search a.org b.org c.org d.org e.org f.org g.org h.org\n"}) {
     testing::writeFile("/etc/resolv.conf", file);
-    Listeners listeners({"127.0.0.1"}, kNoSuchName);
+    DnsListeners listeners({"127.0.0.1"}, DnsListeners::kNoSuchName);
     listeners.lookUp("name");
     StringList expected;
     for (const std::string& suffix : parseResolvConf(file, hostName).search) expected.push_back("name." + suffix);
