@@ -7,6 +7,7 @@
 #include "cimom/OperationsArguments.h"
 #include "cimom/OperationsSelection.h"
 #include "cimxml/ElementWriter.h"
+#include "frontend/HostApply.h"
 #include "frontend/ReadBack.h"
 #include "util/Expected.h"
 
@@ -98,11 +99,12 @@ Status modifyAndNote(const Operation& operation, const Instance& instance,
                      const std::optional<std::vector<std::string>>& propertyList) {
   std::vector<broker::Property> changed;
   Status status = frontend::modifyInstance(operation.broker, instance, propertyList, operation.caller, &changed);
-  if (!status.ok() || changed.empty()) return status;
+  if (!status.ok()) return status;
   std::vector<std::string> names;
   for (const broker::Property& property : changed) names.push_back(property.name);
-  noteChange(operation, "changed", instance.path, names);
-  return status;
+  if (!names.empty()) noteChange(operation, "changed", instance.path, names);
+  // Also where nothing changed: a client repeats a change that did not reach the host.
+  return frontend::applyToHost(instance.path, frontend::SettingsLockIs::Free).status;
 }
 
 Status modifyInstance(Operation& operation) {

@@ -6,7 +6,7 @@ void addCommands(CommandLine& line) {
   // Help lists them in this order.
   for (const auto add : {addShowCommand, addTreeCommand, addClassesCommand, addGraphCommand, addReadCommands,
                          addAssociationCommands, addModifyCommand, addInvokeCommand, addIfcfgCommands, addDnsCommands,
-                         addDomainCommand, addSuffixesCommands, addOverlayCommands, addCompletionCommands}) {
+                         addDomainCommand, addSuffixesCommands, addOverlayCommands, addApplyCommands, addCompletionCommands}) {
     add(line);
   }
 }

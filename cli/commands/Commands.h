@@ -23,6 +23,7 @@ void addDnsCommands(CommandLine& line);
 void addDomainCommand(CommandLine& line);
 void addSuffixesCommands(CommandLine& line);
 void addOverlayCommands(CommandLine& line);
+void addApplyCommands(CommandLine& line);
 void addCompletionCommands(CommandLine& line);
 
 }  // namespace zorva::cli

@@ -97,6 +97,21 @@ std::string overlayJson(const std::vector<OverlayRow>& rows) {
   }));
 }
 
+std::string applyResultsJson(const std::vector<zorva::agent::ApplyResult>& results) {
+  return dumped(ofRows(results, [](const zorva::agent::ApplyResult& result) {
+    Json entry;
+    entry["interface"] = asUtf8(result.interface);
+    entry["owner"] = asUtf8(result.owner);
+    entry["profile"] = asUtf8(result.profile);
+    entry["changes"] = ofRows(result.changes, [](const zorva::agent::PropertyChange& change) {
+      return Json{{"property", change.property}, {"before", ofTexts(change.before)}, {"after", ofTexts(change.after)}};
+    });
+    if (!result.problem.empty()) entry["problem"] = asUtf8(result.problem);
+    if (!result.note.empty()) entry["note"] = asUtf8(result.note);
+    return entry;
+  }));
+}
+
 std::string graphJson(const Graph& graph) {
   Json json;
   json["objects"] = ofRows(graph.objects, [](const GraphObject& object) {

@@ -6,6 +6,7 @@
 #include <string>
 #include <vector>
 
+#include "agent/apply/Apply.h"
 #include "cli/commands/Graph.h"
 #include "cli/output/TreeText.h"
 #include "cli/session/HostView.h"
@@ -21,6 +22,10 @@ std::string settingFileJson(const std::string& path, const std::vector<SettingLi
 
 /// The values of the overlay: "node", "property", "value".
 std::string overlayJson(const std::vector<OverlayRow>& rows);
+
+/// The results of `apply` and `revert`, in order: "interface", "owner", "profile", "changes" with the "property" and its
+/// values "before" and "after", and, where there is one, the "problem" or the "note".
+std::string applyResultsJson(const std::vector<zorva::agent::ApplyResult>& results);
 
 /// "objects", each with "path" and, if it cannot be fetched, "problem"; "associations" with their class and the indices
 /// of their ends in the list of objects.

@@ -11,6 +11,7 @@
 #include "cli/output/Text.h"
 #include "cli/output/ValueText.h"
 #include "cli/session/HostView.h"
+#include "frontend/HostApply.h"
 #include "frontend/ReadBack.h"
 #include "frontend/SettingPlace.h"
 #include "util/Names.h"
@@ -76,6 +77,13 @@ void requireModified(const broker::ObjectPath& path, const broker::Status& statu
                              : "");
 }
 
+/// A server that is asked does this itself. The lock is held: commands that change hold it as a whole.
+void bringToHost(const broker::ObjectPath& path) {
+  const frontend::HostEffect effect = frontend::applyToHost(path, frontend::SettingsLockIs::Held);
+  if (!effect.status.ok()) throw Failure(ExitCode::Failed, printable(effect.status.message), "zorvactl apply tries again");
+  if (!effect.done.empty()) tellNote(printable(effect.done));
+}
+
 }  // namespace
 
 broker::Instance changeInstance(Session& session, const broker::ObjectPath& path,
@@ -99,6 +107,7 @@ broker::Instance changeInstance(Session& session, const broker::ObjectPath& path
   // Local changes have been checked already, under the same lock.
   requireModified(found.path,
                   session.isRemote() ? frontend::checkChanges(now, changes, reasonThere) : checkFiles(now, changes));
+  if (!session.isRemote()) bringToHost(found.path);
   return now;
 }
 
