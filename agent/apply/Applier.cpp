@@ -96,6 +96,7 @@ std::vector<ApplyResult> Applier::apply(const std::vector<std::string>& names, c
   std::vector<ApplyResult> results;
   for (Plan& plan : plans) {
     if (!options.dryRun && plan.mustWrite()) execute(plan);
+    if (!plan.result.problem.empty()) plan.result.changes.clear();
     results.push_back(std::move(plan.result));
   }
   return results;
@@ -235,7 +236,6 @@ void Applier::execute(Plan& plan) {
     plan.result.note = writer.note();
     return;
   }
-  plan.result.changes.clear();
   plan.result.problem = written ? notTaken(plan) : written.error();
   if (written) {
     const auto restored = writer.restore(plan.target, plan.saved);

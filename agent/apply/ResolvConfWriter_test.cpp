@@ -4,6 +4,7 @@
 #include <unistd.h>
 
 #include "agent/apply/testing/ApplyHost.h"
+#include "agent/testing/DnsListeners.h"
 
 namespace zorva::agent {
 namespace {
@@ -15,7 +16,7 @@ using testing::writeFile;
 
 constexpr const char* kFile = "/etc/resolv.conf";
 constexpr const char* kBefore =
-    "# ours\noptions ndots:2 rotate\nnameserver 203.0.113.1\nnameserver 203.0.113.2\nsortlist 192.0.2.0\n"
+    "# ours\noptions ndots:1 rotate\nnameserver 203.0.113.1\nnameserver 203.0.113.2\nsortlist 192.0.2.0\n"
     "domain old.example";
 
 bool onPlainHost(const std::function<void(ApplyHost&)>& work) {
@@ -35,7 +36,7 @@ TEST(ResolvConfChange, KeepsOptionsCommentsAndOtherLines) {
               "eth0: dns_server_addresses 203.0.113.1 203.0.113.2 -> 192.0.2.1 2001:db8::1 \n"
               "eth0: dns_suffixes old.example -> lab.example example.org \n");
     EXPECT_EQ(contentsOf(kFile),
-              "# ours\noptions ndots:2 rotate\nnameserver 192.0.2.1\nnameserver 2001:db8::1\nsortlist 192.0.2.0\n"
+              "# ours\noptions ndots:1 rotate\nnameserver 192.0.2.1\nnameserver 2001:db8::1\nsortlist 192.0.2.0\n"
               "search lab.example example.org\n");
     EXPECT_EQ(host.shown("eth0"), "192.0.2.1 2001:db8::1 /lab.example example.org ");
   }));
@@ -196,6 +197,46 @@ TEST(ResolvConfChange, AReadOnlyFileSystemIsReportedAndNothingIsRemembered) {
         "mount -o remount,ro,bind /var/lib/zorvagent");
     EXPECT_THROW(host.apply(), std::runtime_error);
     EXPECT_EQ(contentsOf(kFile), kBefore) << "what cannot be taken back is not done";
+  }));
+}
+
+TEST(ResolvConfChange, AProcessThatIsKilledLeavesTheOldStateOrTheNewOne) {
+  ZORVAGENT_NEEDS_PRIVATE_HOST();
+  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+    host.want("eth0", "DNSSERVERS=192.0.2.1\n");
+    host.apply();
+    const std::string after = contentsOf(kFile);
+    host.revert();
+    constexpr int kDeaths = 30;
+    for (int death = 0; death < kDeaths; ++death) {
+      testing::killAfter(std::chrono::microseconds(500 * death), [] { ApplyHost::apply(); });
+      const std::string left = contentsOf(kFile);
+      EXPECT_TRUE(left == kBefore || left == after) << left;
+      host.revert();
+      EXPECT_EQ(contentsOf(kFile), kBefore);
+    }
+  }));
+}
+
+TEST(ResolvConfChange, TheCLibraryAsksTheServerThatWasSet) {
+  ZORVAGENT_NEEDS_PRIVATE_HOST();
+  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+    const std::vector<std::string> servers{"203.0.113.1", "192.0.2.99"};
+    for (const std::string& server : servers) host.interfaces.addAddress("lo", server, 32);
+    writeFile("/etc/nsswitch.conf", "hosts: dns\n");
+    host.want("eth0", "DNSSERVERS=192.0.2.99\nDNSSUFFIXES=new.example\n");
+    const auto askedFor = [&](const std::string& name) {
+      testing::DnsListeners listeners(servers, testing::DnsListeners::kNoSuchName);
+      listeners.lookUp(name);
+      StringList asked = listeners.asked;
+      asked.insert(asked.end(), listeners.names.begin(), listeners.names.end());
+      return asked;
+    };
+    EXPECT_EQ(askedFor("name"), (StringList{"203.0.113.1", "name.old.example", "name"}));
+    host.apply();
+    EXPECT_EQ(askedFor("name"), (StringList{"192.0.2.99", "name.new.example", "name"}));
+    host.revert();
+    EXPECT_EQ(askedFor("name"), (StringList{"203.0.113.1", "name.old.example", "name"}));
   }));
 }
 

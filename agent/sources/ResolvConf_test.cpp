@@ -252,5 +252,32 @@ TEST(ResolvConf, TheSuffixesThatAreShownAreThoseThatAreTried) {
   EXPECT_TRUE(testing::succeedsOnPrivateHost(resolverTriesTheSuffixesThatAreShown));
 }
 
+struct Replacement {
+  const char* before;
+  std::optional<StringList> servers;
+  std::optional<StringList> search;
+  const char* after;
+};
+
+TEST(ResolvConf, ReplacedListsLeaveTheOtherLinesAsTheyAre) {
+  const std::vector<Replacement> replacements{
+      {"", StringList{"192.0.2.1"}, StringList{"a.org"}, "search a.org\nnameserver 192.0.2.1\n"},
+      {"# a\nnameserver 1.1.1.1\noptions rotate\nnameserver 2.2.2.2\n; b\r\n",
+       StringList{"192.0.2.1", "192.0.2.2"},
+       {},
+       "# a\nnameserver 192.0.2.1\nnameserver 192.0.2.2\noptions rotate\n; b\r\n"},
+      {"search a.org\nnameserver 1.1.1.1\r\ndomain b.org",
+       {},
+       StringList{"c.org", "d.org"},
+       "search c.org d.org\nnameserver 1.1.1.1\r\n"},
+      {"options rotate", StringList{"192.0.2.1"}, {}, "options rotate\nnameserver 192.0.2.1\n"},
+      {"nameserver 1.1.1.1\nsearch a.org\n", StringList{}, StringList{}, "search .\n"},
+      {"nameserver 1.1.1.1\nx", {}, {}, "nameserver 1.1.1.1\nx"},
+      {" nameserver 1.1.1.1\nsearchx\n", StringList{}, {}, " nameserver 1.1.1.1\nsearchx\n"}};
+  for (const Replacement& replacement : replacements) {
+    EXPECT_EQ(replaceInResolvConf(replacement.before, replacement.servers, replacement.search), replacement.after);
+  }
+}
+
 }  // namespace
 }  // namespace zorva::agent

@@ -4,8 +4,11 @@
 
 #include <gtest/gtest.h>
 
+#include <chrono>
+#include <csignal>
 #include <filesystem>
 #include <string>
+#include <thread>
 
 #include "agent/Agent.h"
 #include "agent/Runtime.h"
@@ -16,6 +19,18 @@
 #include "agent/testing/TemporaryDirectory.h"
 
 namespace zorva::agent::testing {
+
+/// Lets another process do the work and kills it after that time.
+template <typename Time, typename Work>
+void killAfter(Time time, Work work) {
+  const pid_t child = startChild([&work] {
+    work();
+    return true;
+  });
+  std::this_thread::sleep_for(time);
+  ::kill(child, SIGKILL);
+  ::waitpid(child, nullptr, 0);
+}
 
 /// Made inside of a private host.
 class ApplyHost {
