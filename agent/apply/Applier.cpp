@@ -171,29 +171,13 @@ void Applier::planSettings(Plan& plan, const WantedSettings& wanted) {
   plan.before = host_.shown(plan.interface, owner);
   plan.settings = plan.before.lists;
   if (wanted.servers.has_value()) plan.settings.servers = *wanted.servers;
-
-  StringList& suffixes = plan.settings.suffixes;
-  const auto added = state_.memory.addedDomains.find(plan.interface.name);
-  const bool hasAdded =
-      added != state_.memory.addedDomains.end() && !suffixes.empty() && util::sameName(suffixes.front(), added->second);
-  if (wanted.suffixes.has_value() || wanted.domain.has_value()) {
-    if (wanted.suffixes.has_value()) {
-      suffixes = *wanted.suffixes;
-    } else if (hasAdded) {
-      suffixes.erase(suffixes.begin());
-    }
-    const std::string ownDomain = owner == kResolvConfOwner ? std::string() : host_.ownDomain();
-    const StringList list = searchListOf(suffixes, wanted.domain.value_or(""), ownDomain);
-    if (list.size() > suffixes.size()) plan.addedDomain = list.front();
-    suffixes = list;
-  } else if (hasAdded) {
-    plan.addedDomain = added->second;
-  }
+  const std::string ownDomain = owner == kResolvConfOwner ? std::string() : host_.ownDomain();
+  planSuffixes(plan, wanted, ownDomain);
 
   plan.after.lists = writer.asHeld(plan.settings);
   if (sameLists(plan.after.lists, writer.asHeld(plan.before.lists))) return;
   const StringList& names = plan.after.lists.suffixes;
-  if (owner != kResolvConfOwner) plan.after.domain = names.empty() ? host_.ownDomain() : names.front();
+  if (owner != kResolvConfOwner) plan.after.domain = names.empty() ? ownDomain : names.front();
   plan.result.changes = differences(plan.before, plan.after);
   const auto saved = writer.save(plan.target);
   if (saved) {
@@ -201,6 +185,23 @@ void Applier::planSettings(Plan& plan, const WantedSettings& wanted) {
   } else {
     plan.result.problem = saved.error();
   }
+}
+
+// A domain that was put before the suffixes by an earlier call is none of them.
+void Applier::planSuffixes(Plan& plan, const WantedSettings& wanted, const std::string& ownDomain) const {
+  StringList& suffixes = plan.settings.suffixes;
+  const auto added = state_.memory.addedDomains.find(plan.interface.name);
+  const bool hasAdded =
+      added != state_.memory.addedDomains.end() && !suffixes.empty() && util::sameName(suffixes.front(), added->second);
+  if (!wanted.suffixes.has_value() && !wanted.domain.has_value()) {
+    if (hasAdded) plan.addedDomain = added->second;
+    return;
+  }
+  if (hasAdded) suffixes.erase(suffixes.begin());
+  if (wanted.suffixes.has_value()) suffixes = *wanted.suffixes;
+  StringList list = searchListOf(suffixes, wanted.domain.value_or(""), ownDomain);
+  if (list.size() > suffixes.size()) plan.addedDomain = list.front();
+  suffixes = std::move(list);
 }
 
 // A file of several interfaces has one list for all of them.

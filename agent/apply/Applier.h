@@ -46,6 +46,7 @@ class Applier {
   Plan planFor(const HostInterface& interface, const OverlayValues& overlay);
   void planOwner(Plan& plan);
   void planSettings(Plan& plan, const WantedSettings& wanted);
+  void planSuffixes(Plan& plan, const WantedSettings& wanted, const std::string& ownDomain) const;
   void refuseSharedStores(std::vector<Plan>& plans) const;
   void execute(Plan& plan);
   void remember(const Plan& plan);

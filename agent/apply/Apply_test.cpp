@@ -18,6 +18,7 @@ using std::chrono::seconds;
 using testing::ApplyHost;
 using testing::contentsOf;
 using testing::Daemons;
+using testing::onPlainHost;
 using testing::outputOf;
 using testing::writeFile;
 
@@ -26,15 +27,6 @@ constexpr const char* kState = "/var/lib/zorvagent/applied.json";
 constexpr const char* kBefore = "nameserver 203.0.113.1\n";
 constexpr const char* kFirst = "nameserver 192.0.2.1\n";
 constexpr const char* kSecond = "nameserver 192.0.2.2\n";
-
-bool onPlainHost(const std::function<void(ApplyHost&)>& work) {
-  return testing::succeedsOnPrivateHost([&] {
-    writeFile(kFile, kBefore);
-    ApplyHost host;
-    work(host);
-    return true;
-  });
-}
 
 bool onHostWithDaemons(const std::function<void(ApplyHost&)>& work) {
   return testing::succeedsOnHostWithDaemons([&] {
@@ -68,7 +60,7 @@ std::string problemOf(const std::function<void()>& work) {
 
 TEST(Trial, ThatEndsIsTakenBackByAnyProcess) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     EXPECT_FALSE(pendingTrial().has_value());
     EXPECT_TRUE(endTrial().empty());
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
@@ -89,7 +81,7 @@ TEST(Trial, ThatEndsIsTakenBackByAnyProcess) {
 
 TEST(Trial, ThatIsConfirmedStaysAndCanBeReverted) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
     host.apply({}, onTrial(seconds(60)));
     confirmTrial();
@@ -103,7 +95,7 @@ TEST(Trial, ThatIsConfirmedStaysAndCanBeReverted) {
 
 TEST(Trial, GoesBackToWhatWasAppliedBeforeIt) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     applyFirst(host);
     host.want("eth0", "DNSSERVERS=192.0.2.2\n");
     host.apply({}, onTrial(seconds(60)));
@@ -117,7 +109,7 @@ TEST(Trial, GoesBackToWhatWasAppliedBeforeIt) {
 
 TEST(Trial, OfARevertGoesBackToWhatWasAppliedAndCanBeRevertedAgain) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     applyFirst(host);
     EXPECT_EQ(host.revert({}, onTrial(seconds(60))), "eth0: dns_server_addresses 192.0.2.1 -> 203.0.113.1 \n");
     EXPECT_EQ(contentsOf(kFile), kBefore);
@@ -130,7 +122,7 @@ TEST(Trial, OfARevertGoesBackToWhatWasAppliedAndCanBeRevertedAgain) {
 
 TEST(Trial, StopsOtherChangesWhileItRunsAndIsTakenBackByTheNextOneAfterItsEnd) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
     host.apply({}, onTrial(seconds(60)));
     const std::string problem = "a trial has not been confirmed; confirm it, or wait until it ends";
@@ -149,7 +141,7 @@ TEST(Trial, StopsOtherChangesWhileItRunsAndIsTakenBackByTheNextOneAfterItsEnd) {
 
 TEST(Trial, OfNothingIsNone) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     applyFirst(host);
     EXPECT_EQ(host.apply({}, onTrial(seconds(60))), "eth0: nothing\n");
     EXPECT_FALSE(pendingTrial().has_value());
@@ -158,7 +150,7 @@ TEST(Trial, OfNothingIsNone) {
 
 TEST(Trial, ThatCannotBeTakenBackIsTriedAgain) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
     host.apply({}, onTrial(seconds(60)));
     outputOf("mount --bind /etc /etc && mount -o remount,ro,bind /etc");
@@ -174,7 +166,7 @@ TEST(Trial, ThatCannotBeTakenBackIsTriedAgain) {
 
 TEST(AppliedState, OfAnotherUserOrOfAnotherShapeIsNotUsed) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     applyFirst(host);
     const auto problem = [&] { return problemOf([&] { host.revert(); }); };
     outputOf(std::string("chown 65534 ") + kState);
@@ -194,7 +186,7 @@ TEST(AppliedState, OfAnotherUserOrOfAnotherShapeIsNotUsed) {
 
 TEST(Refused, AreNamesWithoutAnInterfaceAndTheLoopbackInterface) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
     host.want("lo", "DNSSERVERS=192.0.2.1\n");
     host.want("gone0", "DNSSERVERS=192.0.2.1\n");
@@ -209,7 +201,7 @@ TEST(Refused, AreNamesWithoutAnInterfaceAndTheLoopbackInterface) {
 
 TEST(Refused, AreHostileValuesWithTheWholeInterface) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\nDNSSUFFIXES=good.example ba/d\n");
     EXPECT_EQ(host.apply(), "eth0: PROBLEM dns_suffixes: 'ba/d' is no DNS name\n");
     EXPECT_EQ(contentsOf(kFile), kBefore);
@@ -260,7 +252,7 @@ TEST(Refused, IsATreeOfAFile) {
 
 TEST(Applying, WaitsForAnotherProcessThatApplies) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
     auto lock = std::make_unique<FileLock>("/var/lib/zorvagent/applied.lock");
     const pid_t child = testing::startChild([&] { return host.apply() != ""; });
@@ -292,7 +284,7 @@ void applyToHost() {
 
 TEST(AValueThatIsSet, ReachesTheHostAtOnceWhereThatIsConfigured) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost&) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost&) {
     EXPECT_TRUE(setServers("eth0", {"192.0.2.9"}));
     EXPECT_EQ(contentsOf(kFile), kBefore) << "the overlay is the default";
     applyToHost();
@@ -303,7 +295,7 @@ TEST(AValueThatIsSet, ReachesTheHostAtOnceWhereThatIsConfigured) {
 
 TEST(AValueThatIsSet, IsAFailureWhereTheHostRefusesIt) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost&) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost&) {
     applyToHost();
     testing::LogLines log;
     EXPECT_FALSE(setServers("eth0", {"224.0.0.1"}));
@@ -318,7 +310,7 @@ TEST(AValueThatIsSet, IsAFailureWhereTheHostRefusesIt) {
 
 TEST(AValueThatIsSet, IsOnlyStoredByAProcessWithoutTheRights) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost&) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost&) {
     applyToHost();
     outputOf("chmod 777 /var/lib/zorvagent");
     constexpr uid_t kNobody = 65534;

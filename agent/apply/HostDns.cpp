@@ -43,33 +43,34 @@ bool sameLists(const DnsSettings& left, const DnsSettings& right) {
 HostDns::HostDns(Look look) : look_(std::move(look)), bus_(kBusSocket), choice_(bus_, kRoot) {}
 
 void HostDns::look() {
-  links_ = reader_.read().links;
-  choice_.look(links_);
+  const std::vector<Link> links = reader_.read().links;
+  links_.clear();
+  for (const Link& link : links) links_[link.name] = link;
+  choice_.look(links);
   tree_ = look_();
+}
+
+HostInterface HostDns::interfaceOf(const std::string& name, const std::string& path) const {
+  const auto link = links_.find(name);
+  return {name, path, link == links_.end() ? Link() : link->second};
 }
 
 std::vector<HostInterface> HostDns::interfaces() const {
   std::vector<HostInterface> interfaces;
   for (const Node& node : tree_->nodes()) {
-    if (node.type() != NodeType::NetworkIPConfig) continue;
-    HostInterface found{textOf(node, PROP_NAME), node.path(), {}};
-    for (const Link& link : links_) {
-      if (link.name == found.name) found.link = link;
-    }
-    interfaces.push_back(std::move(found));
+    if (node.type() == NodeType::NetworkIPConfig)
+      interfaces.push_back(interfaceOf(textOf(node, PROP_NAME), node.path()));
   }
   return interfaces;
 }
 
 // The tree may lack the loopback interface.
 HostInterface HostDns::interface(const std::string& name) const {
-  for (HostInterface& interface : interfaces()) {
-    if (interface.name == name) return std::move(interface);
+  for (const Node& node : tree_->nodes()) {
+    if (node.type() == NodeType::NetworkIPConfig && textOf(node, PROP_NAME) == name)
+      return interfaceOf(name, node.path());
   }
-  for (const Link& link : links_) {
-    if (link.name == name) return {name, {}, link};
-  }
-  return {name, {}, {}};
+  return interfaceOf(name, {});
 }
 
 std::vector<std::string> HostDns::othersWith(const ChosenOwner& owner, const HostInterface& interface) const {

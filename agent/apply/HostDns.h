@@ -7,6 +7,7 @@
 #include <map>
 #include <memory>
 #include <string>
+#include <unordered_map>
 #include <vector>
 
 #include "agent/apply/AppliedState.h"
@@ -65,6 +66,7 @@ class HostDns {
   bool waitUntilShown(const DnsTarget& target, const std::string& owner, const DnsSettings& lists);
 
  private:
+  HostInterface interfaceOf(const std::string& name, const std::string& path) const;
   const Node* nodeOf(const HostInterface& interface) const;
 
   Look look_;
@@ -72,7 +74,7 @@ class HostDns {
   OwnerChoice choice_;
   LinkReader reader_;
   std::shared_ptr<const TreeSnapshot> tree_;
-  std::vector<Link> links_;
+  std::unordered_map<std::string, Link> links_;  ///< by name
   std::map<std::string, std::unique_ptr<DnsWriter>> writers_;
 };
 

@@ -11,6 +11,7 @@ namespace {
 
 using testing::ApplyHost;
 using testing::contentsOf;
+using testing::onPlainHost;
 using testing::outputOf;
 using testing::writeFile;
 
@@ -19,18 +20,9 @@ constexpr const char* kBefore =
     "# ours\noptions ndots:1 rotate\nnameserver 203.0.113.1\nnameserver 203.0.113.2\nsortlist 192.0.2.0\n"
     "domain old.example";
 
-bool onPlainHost(const std::function<void(ApplyHost&)>& work) {
-  return testing::succeedsOnPrivateHost([&] {
-    writeFile(kFile, kBefore);
-    ApplyHost host;
-    work(host);
-    return true;
-  });
-}
-
 TEST(ResolvConfChange, KeepsOptionsCommentsAndOtherLines) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1 2001:db8::1\nDNSSUFFIXES=lab.example example.org\n");
     EXPECT_EQ(host.apply({"eth0"}),
               "eth0: dns_server_addresses 203.0.113.1 203.0.113.2 -> 192.0.2.1 2001:db8::1 \n"
@@ -44,7 +36,7 @@ TEST(ResolvConfChange, KeepsOptionsCommentsAndOtherLines) {
 
 TEST(ResolvConfChange, ASecondOneChangesNothing) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\nDOMAINNAME=new.example\n");
     host.apply();
     const std::string first = outputOf("stat -c '%i %y' /etc/resolv.conf; cat /etc/resolv.conf");
@@ -56,7 +48,7 @@ TEST(ResolvConfChange, ASecondOneChangesNothing) {
 
 TEST(ResolvConfChange, ADryRunOnlySaysWhatWouldChange) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
     ApplyOptions dry;
     dry.dryRun = true;
@@ -68,7 +60,7 @@ TEST(ResolvConfChange, ADryRunOnlySaysWhatWouldChange) {
 
 TEST(ResolvConfChange, IsTakenBackToTheLastByte) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
     host.apply();
     host.want("eth0", "DNSSERVERS=192.0.2.2\n");
@@ -82,7 +74,7 @@ TEST(ResolvConfChange, IsTakenBackToTheLastByte) {
 
 TEST(ResolvConfChange, AFileThatWasNotThereIsRemovedAgain) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     ::unlink(kFile);
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
     EXPECT_EQ(host.apply(), "eth0: dns_server_addresses 127.0.0.1 -> 192.0.2.1 \n");
@@ -93,7 +85,7 @@ TEST(ResolvConfChange, AFileThatWasNotThereIsRemovedAgain) {
 
 TEST(ResolvConfChange, IsRefusedWhereTwoInterfacesHaveDifferentLists) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
     host.want("tun1", "DNSSERVERS=192.0.2.9\n");
     const std::string result = host.apply();
@@ -123,7 +115,7 @@ class GeneratedResolvConf : public ::testing::TestWithParam<Generated> {};
 
 TEST_P(GeneratedResolvConf, IsLeftAlone) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     outputOf(std::string("f=/etc/resolv.conf; ") + GetParam().make);
     const std::string before = outputOf("ls -l /etc/resolv.conf; cat /etc/resolv.conf");
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
@@ -175,7 +167,7 @@ INSTANTIATE_TEST_SUITE_P(
 
 TEST(ResolvConfChange, FollowsALinkToAPlainFile) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     outputOf("mkdir /etc/net; mv /etc/resolv.conf /etc/net/mine; ln -s net/mine /etc/resolv.conf");
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
     host.apply();
@@ -186,7 +178,7 @@ TEST(ResolvConfChange, FollowsALinkToAPlainFile) {
 
 TEST(ResolvConfChange, AReadOnlyFileSystemIsReportedAndNothingIsRemembered) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
     outputOf("mount --bind /etc /etc && mount -o remount,ro,bind /etc");
     EXPECT_EQ(host.apply(), "eth0: PROBLEM /etc/resolv.conf.new: cannot be opened: Read-only file system\n");
@@ -202,7 +194,7 @@ TEST(ResolvConfChange, AReadOnlyFileSystemIsReportedAndNothingIsRemembered) {
 
 TEST(ResolvConfChange, AProcessThatIsKilledLeavesTheOldStateOrTheNewOne) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
     host.apply();
     const std::string after = contentsOf(kFile);
@@ -220,7 +212,7 @@ TEST(ResolvConfChange, AProcessThatIsKilledLeavesTheOldStateOrTheNewOne) {
 
 TEST(ResolvConfChange, TheCLibraryAsksTheServerThatWasSet) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(onPlainHost([](ApplyHost& host) {
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     const std::vector<std::string> servers{"203.0.113.1", "192.0.2.99"};
     for (const std::string& server : servers) host.interfaces.addAddress("lo", server, 32);
     writeFile("/etc/nsswitch.conf", "hosts: dns\n");

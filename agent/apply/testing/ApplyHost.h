@@ -7,6 +7,7 @@
 #include <chrono>
 #include <csignal>
 #include <filesystem>
+#include <functional>
 #include <string>
 #include <thread>
 
@@ -92,5 +93,15 @@ class ApplyHost {
 
   Interfaces interfaces;
 };
+
+/// Does the work on a private host with that /etc/resolv.conf and without daemons. True where no expectation fails.
+inline bool onPlainHost(const std::string& resolvConf, const std::function<void(ApplyHost&)>& work) {
+  return succeedsOnPrivateHost([&] {
+    writeFile("/etc/resolv.conf", resolvConf);
+    ApplyHost host;
+    work(host);
+    return true;
+  });
+}
 
 }  // namespace zorva::agent::testing
