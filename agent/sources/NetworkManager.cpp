@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <utility>
 
-#include "agent/tree/IpAddress.h"
+#include "agent/sources/NetworkManagerValues.h"
 
 namespace zorva::agent {
 namespace {
@@ -16,16 +16,6 @@ std::string changesOf(const std::string& interface) {
   return "interface='org.freedesktop.DBus.Properties',member='PropertiesChanged',arg0='" + (kPrefix + interface) + '\'';
 }
 
-StringList readTexts(BusReader& reader) {
-  StringList texts;
-  reader.forEach("s", [&] { texts.push_back(reader.text()); });
-  return texts;
-}
-
-void ifTexts(BusReader& reader, StringList& texts) {
-  reader.ifVariant("as", [&] { texts = readTexts(reader); });
-}
-
 // A list of dictionaries that have the address, with other things, as text.
 void ifAddressData(BusReader& reader, StringList& addresses) {
   reader.ifVariant("aa{sv}", [&] {
@@ -36,26 +26,6 @@ void ifAddressData(BusReader& reader, StringList& addresses) {
         if (name == "address") reader.ifText(address);
       });
       addresses.push_back(std::move(address));
-    });
-  });
-}
-
-// IPv6 addresses as bytes.
-void ifAddressBytes(BusReader& reader, StringList& addresses) {
-  reader.ifVariant("aay", [&] {
-    addresses.clear();
-    reader.forEach("ay", [&] { addresses.push_back(textOfAddress(reader.bytes())); });
-  });
-}
-
-// IPv4 addresses as numbers in network order.
-void ifAddressNumbers(BusReader& reader, StringList& addresses) {
-  reader.ifVariant("au", [&] {
-    addresses.clear();
-    reader.forEach("u", [&] {
-      const std::uint32_t number = reader.number();
-      const auto* bytes = reinterpret_cast<const unsigned char*>(&number);
-      addresses.push_back(textOfAddress({bytes, bytes + sizeof number}));
     });
   });
 }
