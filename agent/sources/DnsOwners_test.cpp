@@ -10,6 +10,7 @@
 
 #include "agent/testing/LogLines.h"
 #include "agent/testing/NetworkNamespace.h"
+#include "agent/testing/ObservedOwners.h"
 #include "agent/testing/PrivateHostTest.h"
 #include "agent/testing/TemporaryDirectory.h"
 
@@ -19,43 +20,13 @@ namespace {
 using testing::Daemons;
 using testing::Interfaces;
 using testing::LogLines;
+using testing::makeCables;
+using testing::makeLeases;
+using testing::Observer;
 using testing::outputOf;
+using testing::soon;
 using testing::succeedsOnHostWithDaemons;
 using testing::writeFile;
-
-// Two cables, eth0 to far0 and tun1 to far1, all of them up.
-void makeCables() {
-  Interfaces interfaces;
-  interfaces.addPair("eth0", "far0");
-  interfaces.addPair("tun1", "far1");
-  for (const char* name : {"eth0", "far0", "tun1", "far1"}) interfaces.setUp(name, true);
-}
-
-// Asks the owners again at each look, as a cursor does.
-class Observer {
- public:
-  const DnsFacts& operator[](const std::string& name) {
-    links_ = reader_.read().links;
-    if (owners_.changed() || !looked_) owners_.look(links_);
-    looked_ = true;
-    for (const Link& link : links_) {
-      if (link.name == name) facts_ = owners_.factsOf(link);
-    }
-    return facts_;
-  }
-
-  // As when the kernel or a file has reported a change.
-  void lookAgain() { looked_ = false; }
-
-  DnsOwners& owners() { return owners_; }
-
- private:
-  DnsOwners owners_{""};
-  LinkReader reader_;
-  std::vector<Link> links_;
-  DnsFacts facts_;
-  bool looked_ = false;
-};
 
 bool resolvedIsShown() {
   makeCables();
@@ -84,16 +55,6 @@ bool resolvedIsShown() {
 TEST(Owners, ResolvedIsShownAndItsChangesAreNoticed) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
   EXPECT_TRUE(succeedsOnHostWithDaemons(resolvedIsShown));
-}
-
-// Looks until that holds, for at most thirty seconds.
-template <typename Condition>
-bool soon(Condition holds) {
-  for (int turn = 0; turn < 1500; ++turn) {
-    if (holds()) return true;
-    std::this_thread::sleep_for(std::chrono::milliseconds(20));
-  }
-  return false;
 }
 
 bool comingAndGoingIsNoticed() {
@@ -228,14 +189,6 @@ bool everybodyNoticesWhatIsNotSignalled() {
 TEST(Owners, ChangesWithoutASignalAreNoticedByProcessesWithoutRights) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
   EXPECT_TRUE(succeedsOnHostWithDaemons(everybodyNoticesWhatIsNotSignalled));
-}
-
-// far0 gives leases to eth0, with a server and a domain.
-void makeLeases(Daemons& daemons) {
-  writeFile("/etc/systemd/network/10-far.network",
-            "[Match]\nName=far0\n[Network]\nAddress=192.0.2.1/24\nDHCPServer=yes\n"
-            "[DHCPServer]\nDNS=192.0.2.53\nSendOption=15:string:lease.example\n");
-  daemons.start("systemd-networkd");
 }
 
 bool leasesAreLearned() {
