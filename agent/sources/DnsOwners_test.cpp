@@ -191,6 +191,22 @@ TEST(Owners, ChangesWithoutASignalAreNoticedByProcessesWithoutRights) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(everybodyNoticesWhatIsNotSignalled));
 }
 
+bool everyNameIsTheRoot() {
+  makeCables();
+  Daemons daemons;
+  daemons.start("NetworkManager");
+  outputOf(
+      "nmcli connection add type ethernet ifname eth0 con-name lan ipv4.method manual ipv4.addresses 192.0.2.10/24 "
+      "ipv4.dns 192.0.2.53 ipv4.dns-search '~.' ipv6.method disabled && nmcli connection up lan");
+  Observer host;
+  return soon([&] { return host["eth0"].routingDomains == StringList{"."}; });
+}
+
+TEST(Owners, ARoutingDomainForEveryNameIsShownAsTheRoot) {
+  ZORVAGENT_NEEDS_PRIVATE_HOST();
+  EXPECT_TRUE(succeedsOnHostWithDaemons(everyNameIsTheRoot));
+}
+
 bool leasesAreLearned() {
   makeCables();
   Daemons daemons;

@@ -167,7 +167,8 @@ void NetworkManager::takeDevice(const Device& device) {
   StringList domains = ip4.domains;
   append(domains, ip6.domains);
   if (searches.empty()) searches = domains;
-  for (const std::string& search : searches) builder.addDomain(search);
+  // It leaves out the dot at the end of a domain, also where that is all there is.
+  for (const std::string& search : searches) builder.addDomain(search == "~" ? "~." : search);
   domains.insert(domains.end(), facts.suffixes.begin(), facts.suffixes.end());
   const auto domain = std::find_if(domains.begin(), domains.end(), isDomain);
   if (domain != domains.end()) facts.domain = *domain;
