@@ -45,6 +45,9 @@ class BusReader {
   /// Passes over one value.
   void skip();
 
+  /// Appends one value, of whatever type, to a message that is being written. Negative where that fails.
+  int copyTo(sd_bus_message* other) { return ::sd_bus_message_copy(other, message_, 0); }
+
   /// Reads an array: calls each for every element, which must read it whole.
   template <typename Each>
   void forEach(const char* contents, Each each) {
