@@ -50,7 +50,7 @@ std::string argumentFor(const NetworkManagerProfile& profile) {
 
 std::string nameOf(const NetworkManagerProfile& profile) { return "profile " + inOneLine(profile.name); }
 
-// NetworkManager refuses servers and domains of a family with another method than these.
+// With any other method a family is off or has no servers to ask.
 bool takesDns(const Family& family) {
   return family.method == "auto" || family.method == "manual" || family.method == "dhcp";
 }
@@ -59,7 +59,7 @@ bool learnsDns(const Family& family) { return family.method == "auto" || family.
 
 // 0 where that is no number.
 std::chrono::seconds secondsIn(const std::string& text) {
-  std::int32_t number = 0;
+  std::uint32_t number = 0;
   std::from_chars(text.data(), text.data() + text.size(), number);
   return std::chrono::seconds(number);
 }
@@ -76,11 +76,11 @@ std::string addressIn(std::string server) {
   return canonicalAddress(withoutZone(server));
 }
 
-// The wanted servers of one family, each as the profile has it so far.
+// The wanted servers of one family, each as the profile has it so far. Its link is the zone of each.
 StringList serversFor(const StringList& present, const StringList& wanted, bool (*isOfFamily)(const std::string&)) {
   StringList servers;
   for (const std::string& server : wanted) {
-    const std::string address = canonicalAddress(withoutZone(server));
+    const std::string address = withoutZone(server);
     if (!isOfFamily(address)) continue;
     const auto known = std::find_if(present.begin(), present.end(),
                                     [&](const std::string& other) { return addressIn(other) == address; });
@@ -264,9 +264,9 @@ Expected<NetworkManagerProfile, Refusal> NetworkManagerWriter::changed(const Net
   const std::string shown = inOneLine(target.interface);
   if (Refusal reason = foreignZone(target.interface, settings.servers); !reason.empty()) return unexpected(reason);
   NetworkManagerProfile wanted = profile;
-  const StringList suffixes = asHeld(settings).suffixes;
-  wanted.ipv4.dns.servers = serversFor(profile.ipv4.dns.servers, settings.servers, isIPv4Address);
-  wanted.ipv6.dns.servers = serversFor(profile.ipv6.dns.servers, settings.servers, isIPv6Address);
+  const auto [servers, suffixes] = asHeld(settings);
+  wanted.ipv4.dns.servers = serversFor(profile.ipv4.dns.servers, servers, isIPv4Address);
+  wanted.ipv6.dns.servers = serversFor(profile.ipv6.dns.servers, servers, isIPv6Address);
   for (const auto& [family, name] : {std::pair(&wanted.ipv4, "IPv4"), std::pair(&wanted.ipv6, "IPv6")}) {
     if (Refusal reason = reasonAgainst(shown, wanted, *family, name); !reason.empty()) return unexpected(reason);
     if (learnsDns(*family)) family->dns.ignoresLearned = true;
