@@ -1,3 +1,5 @@
+#include <utility>
+
 #include "agent/Runtime.h"
 #include "agent/apply/Applier.h"
 #include "agent/apply/Apply.h"
@@ -13,21 +15,30 @@ const Config& configOfHost() {
   throw ConfigError(config.file, 0, "tree.source", "is a file and no host: nothing can be applied to it");
 }
 
-Applier makeApplier() {
-  return {configOfHost().dataDir, [] { return Runtime::instance().lookAtSource(); }};
+Applier makeApplier(OverlayValues overlay) {
+  return {configOfHost().dataDir, [] { return Runtime::instance().lookAtSource(); }, std::move(overlay)};
+}
+
+// A wrong overlay must not keep anybody from taking changes back.
+OverlayValues overlayIfGood() {
+  try {
+    return Runtime::instance().overlay().read();
+  } catch (const ConfigError&) {
+    return {};
+  }
 }
 
 }  // namespace
 
 std::vector<ApplyResult> applySettings(const std::vector<std::string>& interfaces, const ApplyOptions& options) {
-  return makeApplier().apply(interfaces, Runtime::instance().overlay().read(), options);
+  return makeApplier(Runtime::instance().overlay().read()).apply(interfaces, options);
 }
 
 std::vector<ApplyResult> revertSettings(const std::vector<std::string>& interfaces, const ApplyOptions& options) {
-  return makeApplier().revert(interfaces, options);
+  return makeApplier(overlayIfGood()).revert(interfaces, options);
 }
 
-std::vector<ApplyResult> endTrial() { return makeApplier().endTrial(); }
+std::vector<ApplyResult> endTrial() { return makeApplier(overlayIfGood()).endTrial(); }
 
 std::optional<std::chrono::system_clock::time_point> pendingTrial() { return pendingTrialIn(configOfHost().dataDir); }
 

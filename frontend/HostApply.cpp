@@ -36,7 +36,7 @@ std::string interfaceOf(const broker::ObjectPath& path) {
 ApplyResult resultFor(const std::string& interface, bool isDryRun, SettingsLockIs lock) {
   std::optional<agent::SettingsLock> own;
   if (lock == SettingsLockIs::Free) own.emplace(agent::dataDirectory(), agent::Access::Read);
-  const std::vector<ApplyResult> results = agent::applySettings({interface}, {isDryRun, std::nullopt});
+  const std::vector<ApplyResult> results = agent::applySettings({interface}, {isDryRun, false, std::nullopt});
   return results.empty() ? ApplyResult() : results.front();
 }
 

@@ -5,11 +5,13 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <stdexcept>
 #include <utility>
 
 #include "agent/config/Config.h"
 #include "agent/log/LogOutput.h"
 #include "agent/tree/Json.h"
+#include "util/FileError.h"
 #include "util/ReadFile.h"
 #include "util/ReplaceFile.h"
 
@@ -18,7 +20,8 @@ namespace {
 
 using Kind = JsonValue::Kind;
 
-constexpr const char* kFileName = "applied.json";
+constexpr const char* kDirectory = "applied/";
+constexpr const char* kFileName = "state.json";
 
 // Reads a document whose every member is expected; throws ConfigError for any other shape.
 class StateReader {
@@ -28,6 +31,7 @@ class StateReader {
   AppliedState state(const JsonValue& value) const {
     AppliedState state;
     state.memory = memory(value);
+    state.heldBack = textsByInterface(member(value, "held_back", Kind::Object));
     if (value.find("trial") == nullptr) return state;
     const JsonValue& trial = member(value, "trial", Kind::Object);
     state.trial.emplace();
@@ -41,11 +45,14 @@ class StateReader {
   AppliedMemory memory(const JsonValue& value) const {
     AppliedMemory memory;
     memory.first = saved(member(value, "first", Kind::List));
-    const JsonValue& domains = member(value, "added_domains", Kind::Object);
-    for (std::size_t i = 0; i < domains.keys.size(); ++i) {
-      memory.addedDomains.emplace(domains.keys[i], text(domains.items[i]));
-    }
+    memory.addedDomains = textsByInterface(member(value, "added_domains", Kind::Object));
     return memory;
+  }
+
+  std::map<std::string, std::string> textsByInterface(const JsonValue& object) const {
+    std::map<std::string, std::string> texts;
+    for (std::size_t i = 0; i < object.keys.size(); ++i) texts.emplace(object.keys[i], text(object.items[i]));
+    return texts;
   }
 
   std::vector<SavedDns> saved(const JsonValue& list) const {
@@ -102,12 +109,16 @@ JsonValue listOf(const std::vector<SavedDns>& all) {
   return list;
 }
 
+JsonValue objectOf(const std::map<std::string, std::string>& texts) {
+  JsonValue object = JsonValue::object();
+  for (const auto& [interface, text] : texts) object.add(interface, JsonValue::ofText(text));
+  return object;
+}
+
 JsonValue objectOf(const AppliedMemory& memory) {
   JsonValue object = JsonValue::object();
   object.add("first", listOf(memory.first));
-  JsonValue domains = JsonValue::object();
-  for (const auto& [interface, domain] : memory.addedDomains) domains.add(interface, JsonValue::ofText(domain));
-  object.add("added_domains", std::move(domains));
+  object.add("added_domains", objectOf(memory.addedDomains));
   return object;
 }
 
@@ -121,8 +132,21 @@ const SavedDns* AppliedMemory::find(const std::string& interface, const std::str
   return found == first.end() ? nullptr : &*found;
 }
 
+std::string appliedDirectory(const std::string& dataDir) {
+  const std::string path = dataDir + kDirectory;
+  if (::mkdir(path.c_str(), S_IRWXU | S_IRGRP | S_IXGRP | S_IROTH | S_IXOTH) != 0 && errno != EEXIST) {
+    util::throwFileError(path, "cannot be made");
+  }
+  struct stat status {};
+  // Without the slash at its end, a link is not followed.
+  if (::lstat(path.substr(0, path.size() - 1).c_str(), &status) != 0) util::throwFileError(path, "cannot be looked at");
+  const bool isOwn = S_ISDIR(status.st_mode) && (status.st_uid == 0 || status.st_uid == ::geteuid());
+  if (isOwn && (status.st_mode & (S_IWGRP | S_IWOTH)) == 0) return path;
+  throw std::runtime_error(path + ": is no directory that only its owner, root, may write to; remove it");
+}
+
 AppliedState AppliedStateFile::read() const {
-  const std::string path = directory_ + kFileName;
+  const std::string path = dataDir_ + kDirectory + kFileName;
   const util::FileText file = util::readFile(path, kLargestJson);
   if (file.error == ENOENT) return {};
   if (file.error != 0) throw ConfigError(path, 0, {}, "cannot be read: " + util::fileErrorText(file.error));
@@ -145,7 +169,8 @@ void AppliedStateFile::write(const AppliedState& state) const {
     trial.add("before", objectOf(state.trial->before));
     document.add("trial", std::move(trial));
   }
-  const std::string unsynced = util::replaceFile(directory_, kFileName, formatJson(document));
+  document.add("held_back", objectOf(state.heldBack));
+  const std::string unsynced = util::replaceFile(appliedDirectory(dataDir_), kFileName, formatJson(document));
   if (!unsynced.empty()) ZORVAGENT_LOG_ERROR(unsynced);
 }
 

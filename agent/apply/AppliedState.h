@@ -6,6 +6,7 @@
 #include <map>
 #include <optional>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "agent/apply/DnsWriter.h"
@@ -46,13 +47,20 @@ struct AppliedState {
 
   AppliedMemory memory;
   std::optional<Trial> trial;
+  /// By interface: the wanted settings, as textOf() has them, that were taken back. They are not applied automatically.
+  std::map<std::string, std::string> heldBack;
 };
 
-/// The file "applied.json" of a data directory. A reader sees the old file or the new one.
+/// The directory of a data directory, "applied/", that only those who apply may write to: the data directory itself may
+/// belong to the user of a server. It is made if it is missing. Throws std::runtime_error, with one line, if it cannot
+/// be made, is a link, or others may write to it.
+std::string appliedDirectory(const std::string& dataDir);
+
+/// The file "applied/state.json" of a data directory. A reader sees the old file or the new one.
 class AppliedStateFile {
  public:
   /// The directory ends in a slash.
-  explicit AppliedStateFile(const std::string& dataDir) : directory_(dataDir) {}
+  explicit AppliedStateFile(std::string dataDir) : dataDir_(std::move(dataDir)) {}
 
   /// Nothing where there is no file. Throws ConfigError where it is wrong. What root restores from it is the host's, so
   /// it must belong to root or to the user of this process, and nobody else may write to it.
@@ -62,7 +70,7 @@ class AppliedStateFile {
   void write(const AppliedState& state) const;
 
  private:
-  std::string directory_;
+  std::string dataDir_;
 };
 
 }  // namespace zorva::agent

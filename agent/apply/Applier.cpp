@@ -20,13 +20,13 @@ namespace {
 using namespace ZV::NodeLexicon;
 using std::chrono::system_clock;
 
-constexpr const char* kLockName = "applied.lock";
+constexpr const char* kLockName = "lock";
 constexpr const char* kNetworkdOwner = "systemd-networkd";
 
 std::unique_ptr<FileLock> lockOf(const std::string& dataDir) {
   constexpr std::chrono::seconds kLongest{30};
   constexpr mode_t kRights = 0600;
-  const std::string path = dataDir + kLockName;
+  const std::string path = appliedDirectory(dataDir) + kLockName;
   util::FileDescriptor file = openLockFile(path, kRights);
   if (!file) util::throwFileError(path, "cannot be opened");
   return std::make_unique<FileLock>(std::move(file), path, FileLock::Mode::Exclusive,
@@ -71,20 +71,20 @@ std::uint64_t secondsOf(system_clock::time_point time) {
 
 }  // namespace
 
-Applier::Applier(const std::string& dataDir, HostDns::Look look)
-    : dataDir_(dataDir), file_(dataDir), host_(std::move(look)) {}
+Applier::Applier(const std::string& dataDir, HostDns::Look look, OverlayValues overlay)
+    : dataDir_(dataDir), file_(dataDir), overlay_(std::move(overlay)), host_(std::move(look)) {}
 
-std::vector<ApplyResult> Applier::apply(const std::vector<std::string>& names, const OverlayValues& overlay,
-                                        const ApplyOptions& options) {
+std::vector<ApplyResult> Applier::apply(const std::vector<std::string>& names, const ApplyOptions& options) {
   const auto lock = options.dryRun ? nullptr : lockOf(dataDir_);
   host_.look();
   readState(!options.dryRun);
   std::vector<Plan> plans;
   const auto hasSettings = [&](const HostInterface& interface) {
     return ::access(settingsFileOf(dataDir_, interface.name).c_str(), F_OK) == 0 ||
-           hasDnsSettings(overlay, interface.path);
+           hasDnsSettings(overlay_, interface.path);
   };
-  for (const HostInterface& interface : choose(names, hasSettings)) plans.push_back(planFor(interface, overlay));
+  for (const HostInterface& interface : choose(names, hasSettings))
+    plans.push_back(planFor(interface, options.automatic));
   refuseSharedStores(plans);
   if (!options.dryRun && options.trial.has_value()) {
     std::vector<SavedDns> saved;
@@ -122,7 +122,7 @@ std::vector<HostInterface> Applier::choose(const std::vector<std::string>& names
   return chosen;
 }
 
-Applier::Plan Applier::planFor(const HostInterface& interface, const OverlayValues& overlay) {
+Applier::Plan Applier::planFor(const HostInterface& interface, bool automatic) {
   Plan plan;
   plan.interface = interface;
   plan.result.interface = interface.name;
@@ -130,9 +130,14 @@ Applier::Plan Applier::planFor(const HostInterface& interface, const OverlayValu
     plan.result.problem = "there is no interface " + inOneLine(interface.name);
     return plan;
   }
-  const auto read = readWanted(dataDir_, interface.name, overlay, interface.path);
+  const auto read = readWanted(dataDir_, interface.name, overlay_, interface.path);
   if (!read) {
     plan.result.problem = read.error();
+    return plan;
+  }
+  const auto held = state_.heldBack.find(interface.name);
+  if (automatic && held != state_.heldBack.end() && held->second == textOf(*read)) {
+    plan.result.note = "these settings were taken back; 'zorvactl apply " + interface.name + "' applies them again";
     return plan;
   }
   const auto wanted = checked(*read, interface.name);
@@ -228,7 +233,7 @@ void Applier::refuseSharedStores(std::vector<Plan>& plans) const {
 
 // The state from before is on the disk before the owner is touched.
 void Applier::execute(Plan& plan) {
-  const AppliedMemory before = state_.memory;
+  const AppliedState before = state_;
   DnsWriter& writer = *host_.writerOf(plan.result.owner);
   remember(plan);
   file_.write(state_);
@@ -246,7 +251,7 @@ void Applier::execute(Plan& plan) {
     }
     plan.result.problem += "; " + plan.interface.name + " is as it was before";
   }
-  state_.memory = before;
+  state_ = before;
   file_.write(state_);
 }
 
@@ -264,6 +269,13 @@ void Applier::remember(const Plan& plan) {
   }
   memory.addedDomains.erase(plan.interface.name);
   if (!plan.addedDomain.empty()) memory.addedDomains[plan.interface.name] = plan.addedDomain;
+  state_.heldBack.erase(plan.interface.name);
+}
+
+// What a person took back must not come again by itself.
+void Applier::holdBack(const std::string& interface) {
+  const auto wanted = readWanted(dataDir_, interface, overlay_, host_.interface(interface).path);
+  if (wanted && wanted->any()) state_.heldBack[interface] = textOf(*wanted);
 }
 
 std::string Applier::notTaken(const Plan& plan) {
@@ -323,6 +335,7 @@ ApplyResult Applier::revertOne(const HostInterface& interface, bool dryRun) {
     if (!one.problem.empty()) result.problem += (result.problem.empty() ? "" : "; ") + one.problem;
     if (dryRun || !one.problem.empty()) continue;
     forget(entry);
+    holdBack(entry.interface);
     file_.write(state_);
   }
   return result;
@@ -405,6 +418,7 @@ std::vector<ApplyResult> Applier::takeBackTrial() {
   for (const SavedDns& saved : state_.trial->saved) {
     results.push_back(restore(saved, false));
     if (!results.back().problem.empty()) left.push_back(saved);
+    holdBack(saved.interface);
   }
   if (left.empty()) {
     state_.memory = state_.trial->before;

@@ -17,10 +17,9 @@ namespace zorva::agent {
 /// One call of the functions in Apply.h. Belongs to one thread.
 class Applier {
  public:
-  Applier(const std::string& dataDir, HostDns::Look look);
+  Applier(const std::string& dataDir, HostDns::Look look, OverlayValues overlay);
 
-  std::vector<ApplyResult> apply(const std::vector<std::string>& names, const OverlayValues& overlay,
-                                 const ApplyOptions& options);
+  std::vector<ApplyResult> apply(const std::vector<std::string>& names, const ApplyOptions& options);
   std::vector<ApplyResult> revert(const std::vector<std::string>& names, const ApplyOptions& options);
   std::vector<ApplyResult> endTrial();
 
@@ -29,7 +28,7 @@ class Applier {
   struct Plan {
     HostInterface interface;
     ApplyResult result;
-    bool hasSettings = false;  ///< in the data directory
+    bool hasSettings = false;  ///< in the data directory, and not held back
     DnsTarget target;
     DnsSettings settings;  ///< to be written
     ShownDns before;
@@ -43,7 +42,8 @@ class Applier {
 
   std::vector<HostInterface> choose(const std::vector<std::string>& names,
                                     const std::function<bool(const HostInterface&)>& isMeant) const;
-  Plan planFor(const HostInterface& interface, const OverlayValues& overlay);
+  Plan planFor(const HostInterface& interface, bool automatic);
+  void holdBack(const std::string& interface);
   void planOwner(Plan& plan);
   void planSettings(Plan& plan, const WantedSettings& wanted);
   void planSuffixes(Plan& plan, const WantedSettings& wanted, const std::string& ownDomain) const;
@@ -64,6 +64,7 @@ class Applier {
 
   std::string dataDir_;
   AppliedStateFile file_;
+  OverlayValues overlay_;
   AppliedState state_;
   HostDns host_;
 };

@@ -30,14 +30,17 @@ struct ApplyResult {
 
 struct ApplyOptions {
   bool dryRun = false;
+  /// As the service does that runs after each change of the data directory: settings that were taken back, by
+  /// revertSettings() or the end of a trial, are left alone until they are changed or applied otherwise.
+  bool automatic = false;
   /// On trial: unless confirmTrial() is called in that time, endTrial() takes it back.
   std::optional<std::chrono::seconds> trial;
 };
 
 /// All functions here: the caller holds the SettingsLock of the data directory (for reading at least). One process at a
-/// time applies ("applied.lock"); another one waits, 30 s at most. The state before the first change, and that before a
-/// trial, is in "applied.json" before the owner is touched. Thread-safe. Throw ConfigError for a wrong configuration or
-/// state file, std::runtime_error, with one line, if the state cannot be read or written (then nothing was changed).
+/// time applies; another one waits, 30 s at most. The state before the first change, and that before a trial, is in
+/// "applied/state.json" before the owner is touched. Thread-safe. Throw ConfigError for a wrong configuration or state
+/// file, std::runtime_error, with one line, if the state cannot be read or written (then nothing was changed).
 
 /// For these interfaces, or for all that have a file of settings or values in the overlay if none are named. One result
 /// each, in tree order; unknown names first, with a problem.

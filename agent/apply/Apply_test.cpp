@@ -2,9 +2,11 @@
 // host at once.
 #include "agent/apply/Apply.h"
 
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <unistd.h>
 
+#include "agent/apply/AppliedState.h"
 #include "agent/apply/testing/ApplyHost.h"
 #include "agent/files/FileLock.h"
 #include "agent/interface/Instrumentation.h"
@@ -18,12 +20,13 @@ using std::chrono::seconds;
 using testing::ApplyHost;
 using testing::contentsOf;
 using testing::Daemons;
+using ::testing::HasSubstr;
 using testing::onPlainHost;
 using testing::outputOf;
 using testing::writeFile;
 
 constexpr const char* kFile = "/etc/resolv.conf";
-constexpr const char* kState = "/var/lib/zorvagent/applied.json";
+constexpr const char* kState = "/var/lib/zorvagent/applied/state.json";
 constexpr const char* kBefore = "nameserver 203.0.113.1\n";
 constexpr const char* kFirst = "nameserver 192.0.2.1\n";
 constexpr const char* kSecond = "nameserver 192.0.2.2\n";
@@ -250,11 +253,50 @@ TEST(Refused, IsATreeOfAFile) {
   reset();
 }
 
+TEST(Automatically, NothingIsAppliedThatWasTakenBack) {
+  ZORVAGENT_NEEDS_PRIVATE_HOST();
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
+    ApplyOptions automatic;
+    automatic.automatic = true;
+    applyFirst(host);
+    host.revert({"eth0"});
+    EXPECT_THAT(applySettings({}, automatic).front().note, HasSubstr("'zorvactl apply eth0' applies them again"));
+    EXPECT_EQ(contentsOf(kFile), kBefore);
+
+    applyFirst(host);
+    host.want("eth0", "DNSSERVERS=192.0.2.2\n");
+    host.apply({}, onTrial(seconds(60)));
+    EXPECT_EQ(contentsOf(kFile), kSecond);
+    endTrial();
+    host.apply({}, automatic);
+    EXPECT_EQ(contentsOf(kFile), kFirst) << "what was on trial";
+    host.want("eth0", "DNSSERVERS=192.0.2.2 192.0.2.3\n");
+    host.apply({}, automatic);
+    EXPECT_EQ(contentsOf(kFile), "nameserver 192.0.2.2\nnameserver 192.0.2.3\n") << "other settings than those";
+  }));
+}
+
+TEST(StateOfWhatIsApplied, LiesWhereOnlyRootWrites) {
+  ZORVAGENT_NEEDS_PRIVATE_HOST();
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
+    host.want("eth0", "DNSSERVERS=192.0.2.1\n");
+    outputOf("chown 65534 /var/lib/zorvagent; mkdir /etc/elsewhere; ln -s /etc/elsewhere /var/lib/zorvagent/applied");
+    EXPECT_THAT(problemOf([&] { host.apply(); }), HasSubstr("applied/: is no directory that only its owner, root"));
+    outputOf("rm /var/lib/zorvagent/applied; mkdir /var/lib/zorvagent/applied; chown 65534 /var/lib/zorvagent/applied");
+    EXPECT_THAT(problemOf([&] { host.apply(); }), HasSubstr("applied/: is no directory that only its owner, root"));
+    EXPECT_EQ(contentsOf(kFile), kBefore);
+    outputOf("rmdir /var/lib/zorvagent/applied");
+    host.apply();
+    EXPECT_EQ(outputOf("stat -c %u%A /var/lib/zorvagent/applied /var/lib/zorvagent/applied/state.json"),
+              "0drwxr-xr-x\n0-rw-r--r--\n");
+  }));
+}
+
 TEST(Applying, WaitsForAnotherProcessThatApplies) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
   EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
-    auto lock = std::make_unique<FileLock>("/var/lib/zorvagent/applied.lock");
+    auto lock = std::make_unique<FileLock>(appliedDirectory("/var/lib/zorvagent/") + "lock");
     const pid_t child = testing::startChild([&] { return host.apply() != ""; });
     std::this_thread::sleep_for(std::chrono::milliseconds(300));
     EXPECT_EQ(contentsOf(kFile), kBefore);

@@ -147,6 +147,19 @@ Expected<WantedSettings, std::string> checked(const WantedSettings& wanted, cons
   return result;
 }
 
+std::string textOf(const WantedSettings& wanted) {
+  std::string text;
+  const auto add = [&text](const char* name, const StringList& values) {
+    text += name;
+    for (const std::string& value : values) text += ' ' + value;
+    text += ';';
+  };
+  if (wanted.servers.has_value()) add("servers", *wanted.servers);
+  if (wanted.suffixes.has_value()) add("suffixes", *wanted.suffixes);
+  if (wanted.domain.has_value()) add("domain", {*wanted.domain});
+  return text;
+}
+
 StringList searchListOf(const StringList& suffixes, const std::string& domain, const std::string& ownDomain) {
   if (domain.empty() || (!suffixes.empty() && sameName(suffixes.front(), domain))) return suffixes;
   if (suffixes.empty() && sameName(domain, ownDomain)) return {};

@@ -20,6 +20,9 @@ struct WantedSettings {
   bool any() const { return servers.has_value() || suffixes.has_value() || domain.has_value(); }
 };
 
+/// The settings as a text that is equal for equal settings.
+std::string textOf(const WantedSettings& wanted);
+
 inline constexpr std::size_t kMostApplied = 64;  ///< servers, and suffixes
 
 /// The path of an interface's file of settings.

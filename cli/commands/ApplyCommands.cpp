@@ -129,7 +129,7 @@ auto whileSettingsStay(Session& session, Work work) {
 std::vector<ApplyResult> applyOnce(Session& session, const ApplyCommandOptions& options,
                                    std::optional<std::chrono::seconds> trial = std::nullopt) {
   return whileSettingsStay(session, [&] {
-    return zorva::agent::applySettings(options.interfaces, {options.dryRun, trial});
+    return zorva::agent::applySettings(options.interfaces, {options.dryRun, options.automatic, trial});
   });
 }
 
@@ -164,7 +164,9 @@ void awaitVerdict(Session& session, const ApplyCommandOptions& options, std::chr
     case Verdict::EndedElsewhere:
       break;
   }
-  const auto left = asFailure([&] { return zorva::agent::applySettings(options.interfaces, {true, std::nullopt}); });
+  const auto left = asFailure([&] {
+    return zorva::agent::applySettings(options.interfaces, {true, false, std::nullopt});
+  });
   if (changedAny(left)) throw Failure(ExitCode::Failed, "another process took the settings back");
   tellNote("confirmed elsewhere; the settings stay");
 }
@@ -197,7 +199,7 @@ void revert(const Globals& globals, const ApplyCommandOptions& options) {
   requireSelection(options, kRevertWords, true);
   Session session(globals);
   const std::vector<ApplyResult> results = whileSettingsStay(session, [&] {
-    return zorva::agent::revertSettings(options.interfaces, {options.dryRun, std::nullopt});
+    return zorva::agent::revertSettings(options.interfaces, {options.dryRun, false, std::nullopt});
   });
   writeResults(session, globals, results, kRevertWords, options.dryRun);
   requireNoProblem(results, kRevertWords, options.dryRun);
