@@ -208,84 +208,10 @@ std::vector<broker::Instance> instancesOf(Session& session, std::string_view cla
   return instances;
 }
 
-namespace {
-
-// Above this number of instances of one class the associations are only counted on request.
-constexpr std::uint64_t kManyInstances = 500;
-
-ClassRow emptyRow(const Session& session, const broker::ProviderEntry& entry) {
-  ClassRow row{entry.className, {}, {}, std::nullopt, {}};
-  if (!session.isRemote()) {
-    row.provider = entry.prefix;
-    row.library = entry.library;
-  }
-  return row;
-}
-
-void count(Session& session, ClassRow& row) {
-  std::uint64_t count = 0;
-  // Instances of subclasses are counted for their own class.
-  const broker::Status status = session.cim().enumerateInstanceNames({}, row.name, [&](const broker::ObjectPath& path) {
-    count += path.className == row.name ? 1 : 0;
-    return true;
-  });
-  if (status.ok()) {
-    row.count = count;
-  } else {
-    row.problem = statusText(status);
-  }
-}
-
-}  // namespace
-
-std::vector<ClassRow> readClassRows(Session& session, Progress& progress, bool countsAll) {
-  const Session::Quiet quiet(session);
-  std::vector<ClassRow> rows;
-  for (const broker::ProviderEntry& entry : session.cim().served()) rows.push_back(emptyRow(session, entry));
-  std::uint64_t most = 0;
-  for (const bool associations : {false, true}) {
-    if (associations && most > kManyInstances && !countsAll) break;
-    for (ClassRow& row : rows) {
-      if (session.classNamed(row.name).isAssociation() != associations) continue;
-      progress.step("counting " + row.name);
-      count(session, row);
-      most = std::max(most, row.count.value_or(0));
-    }
-  }
-  return rows;
-}
-
-bool isUncounted(const std::vector<ClassRow>& rows) {
-  return std::any_of(rows.begin(), rows.end(), [](const ClassRow& row) { return !row.count && row.problem.empty(); });
-}
-
 bool HostView::couldAsk(std::string_view className) const {
   return std::none_of(problems.begin(), problems.end(), [className](const Problem& each) {
     return std::find(each.names.begin(), each.names.end(), className) != each.names.end();
   });
-}
-
-void addProblem(std::vector<Problem>& problems, const std::string& name, const std::string& what) {
-  auto same =
-      std::find_if(problems.begin(), problems.end(), [&what](const Problem& each) { return each.what == what; });
-  if (same == problems.end()) same = problems.insert(same, {{}, what});
-  if (std::find(same->names.begin(), same->names.end(), name) == same->names.end()) same->names.push_back(name);
-}
-
-std::vector<Problem> problemsOf(const std::vector<ClassRow>& rows) {
-  std::vector<Problem> problems;
-  for (const ClassRow& row : rows) {
-    if (!row.problem.empty()) addProblem(problems, row.name, row.problem);
-  }
-  return problems;
-}
-
-std::string problemText(const Problem& problem) {
-  constexpr std::size_t kShownNames = 20;
-  const std::size_t shown = std::min(problem.names.size(), kShownNames);
-  std::string text = joined({problem.names.begin(), problem.names.begin() + static_cast<std::ptrdiff_t>(shown)}, ", ");
-  if (shown < problem.names.size()) text += " and " + std::to_string(problem.names.size() - shown) + " more";
-  return text + ": " + problem.what;
 }
 
 HostView readHostView(Session& session, Progress& progress, bool countsAll) {

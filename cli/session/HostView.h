@@ -8,6 +8,7 @@
 #include <vector>
 
 #include "cli/output/Progress.h"
+#include "cli/session/ClassRows.h"
 #include "cli/session/Session.h"
 #include "frontend/SettingsClaims.h"
 
@@ -48,20 +49,6 @@ struct SettingRow {
   SettingSource source = SettingSource::None;
 };
 
-struct ClassRow {
-  std::string name;
-  std::string provider;  ///< the prefix of its create functions; empty: not known, for example with a server
-  std::string library;
-  std::optional<std::uint64_t> count;  ///< absent: the provider cannot be queried, or that would take too long
-  std::string problem;                 ///< why it cannot be queried
-};
-
-/// Why some classes, or the associations of some objects, could not be queried.
-struct Problem {
-  std::vector<std::string> names;
-  std::string what;
-};
-
 struct HostView {
   std::string systemName;
   std::vector<EndpointRow> endpoints;  ///< in the order of their names
@@ -75,25 +62,9 @@ struct HostView {
   bool couldAsk(std::string_view className) const;
 };
 
-/// Adds a name to the names with that reason.
-void addProblem(std::vector<Problem>& problems, const std::string& name, const std::string& what);
-
-/// The classes that could not be queried, grouped by reason.
-std::vector<Problem> problemsOf(const std::vector<ClassRow>& rows);
-
-/// "ZORVA_A, ZORVA_B: CIM_ERR_FAILED (1): no library"; of many names the first ones and how many more.
-std::string problemText(const Problem& problem);
-
 /// Queries the providers. A part that cannot be read is left empty and reported in `problems`. Endpoints and settings
 /// are in the order of their names.
 HostView readHostView(Session& session, Progress& progress, bool countsAll);
-
-/// The classes of the registry, with their instances counted. Counting an association may take the square of the time
-/// of its ends; if those are very many, that is done only if `countsAll`.
-std::vector<ClassRow> readClassRows(Session& session, Progress& progress, bool countsAll);
-
-/// Whether some class was not counted because that would take too long.
-bool isUncounted(const std::vector<ClassRow>& rows);
 
 /// The instances of a class. Throws Failure if they cannot be read.
 std::vector<broker::Instance> instancesOf(Session& session, std::string_view className);
