@@ -4,7 +4,10 @@
 #include <gtest/gtest.h>
 #include <sys/resource.h>
 
+#include <map>
 #include <nlohmann/json.hpp>
+#include <regex>
+#include <sstream>
 
 #include "cli/testing/TestHost.h"
 
@@ -58,11 +61,29 @@ TEST(ManyInterfaces, AssociationsAreCountedOnlyIfThatIsAskedFor) {
   const TestHost host(TestHost::manyInterfaces(501));
   EXPECT_THAT(countsOfAssociations(host, {"classes", "-o", "json"}), Each(json(nullptr)));
   EXPECT_THAT(countsOfAssociations(host, {"classes", "-o", "json", "--all"}), Each(testing::Ne(json(nullptr))));
-  for (const char* command : {"show", "classes"}) {
-    EXPECT_EQ(host.run({command}).err,
-              "zorvactl: note: the associations of so many objects are not counted; --all counts them, which takes "
-              "long\n");
+  EXPECT_EQ(
+      host.run({"classes"}).err,
+      "zorvactl: note: the associations of so many objects are not counted; --all counts them, which takes long\n");
+  EXPECT_EQ(host.run({"show"}).err, "");
+}
+
+/// The operations that the providers log at their entry.
+std::map<std::string, int> operationsOf(const TestHost& host, const char* command) {
+  std::map<std::string, int> counts;
+  std::istringstream lines(host.run({command, "--log-level", "3000"}).err);
+  const std::regex operation(R"(ENTERING: (\w+_(Enum|Get|Associat|Referenc)\w*)\(\) in providers/)");
+  for (std::string line; std::getline(lines, line);) {
+    std::smatch found;
+    if (std::regex_search(line, found, operation)) ++counts[found[1]];
   }
+  return counts;
+}
+
+TEST(ManyInterfaces, ShowAsksTheProvidersNoMoreOftenThanWithFew) {
+  const std::map<std::string, int> few = operationsOf(TestHost(), "show");
+  EXPECT_EQ(operationsOf(TestHost(TestHost::manyInterfaces(200)), "show"), few);
+  EXPECT_EQ(few.size(), 3U) << "the endpoints, the settings of the interfaces and of the host";
+  for (const auto& [name, count] : few) EXPECT_THAT(name, EndsWith("_EnumInstances")) << count;
 }
 
 TEST(ManyInterfaces, AGraphFollowsTheFirstObjectsAndSaysSo) {
@@ -84,17 +105,12 @@ TEST(ManyInterfaces, ALineSaysWhatTakesLongAndIsErased) {
   EXPECT_EQ(outcome.out.find("counting"), std::string::npos);
 }
 
-TEST(Show, HasEndpointsAndSettingsInTheOrderOfTheirNames) {
+TEST(Show, HasInterfacesInTheOrderOfTheirNames) {
   const TestHost host({TestHost::port("eth2"), TestHost::port("eth10"), TestHost::port("eth1")});
   const json view = json::parse(host.run({"show", "-o", "json"}).out);
-  std::vector<std::string> endpoints;
-  std::vector<std::string> settings;
-  for (const json& row : view["endpoints"]) endpoints.push_back(row["name"]);
-  for (const json& row : view["interface_settings"]) {
-    if (settings.empty() || settings.back() != row["interface"]) settings.push_back(row["interface"]);
-  }
-  EXPECT_THAT(endpoints, testing::ElementsAre("eth1", "eth10", "eth2"));
-  EXPECT_EQ(settings, endpoints);
+  std::vector<std::string> names;
+  for (const json& row : view["interfaces"]) names.push_back(row["name"]);
+  EXPECT_THAT(names, testing::ElementsAre("eth1", "eth10", "eth2"));
 }
 
 }  // namespace

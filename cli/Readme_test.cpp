@@ -16,7 +16,8 @@ using zorva::agent::testing::contentsOf;
 std::string readme() { return contentsOf(ZORVA_SOURCE_DIR "/README.md"); }
 
 TestHost shownHost() {
-  return TestHost({TestHost::port("eth0", R"("domain_name": "example.org", "dns_suffixes": ["example.org"])"),
+  return TestHost({TestHost::port("eth0", R"("domain_name": "example.org", "dns_suffixes": ["example.org"],)"
+                                          R"("dns_owner": "NetworkManager", "dns_profile": "lan")"),
                    TestHost::port("eth1", R"("dns_server_addresses": [])")});
 }
 
@@ -67,9 +68,9 @@ void runAll(const TestHost& host, const std::string& block) {
 }
 
 TEST(Readme, ShowsWhatShowSays) {
-  const std::string shown = shownHost().run({"show"}).out;
-  const std::string untilClasses = shown.substr(0, shown.find("Classes\n"));
-  EXPECT_THAT(blockAfter("## What you see"), HasSubstr("$ ./run\n" + untilClasses));
+  const TestHost host = shownHost();
+  EXPECT_EQ(blockAfter("## What you see"),
+            "$ ./run\n" + host.run({"show"}).out + "\n$ ./run -- show eth0\n" + host.run({"show", "eth0"}).out);
 }
 
 TEST(Readme, ItsCommandsThatReadWork) {

@@ -11,6 +11,7 @@ namespace zorva::cli {
 void addCommands(CommandLine& line);
 
 void addShowCommand(CommandLine& line);
+void addCheckCommand(CommandLine& line);
 void addTreeCommand(CommandLine& line);
 void addClassesCommand(CommandLine& line);
 void addGraphCommand(CommandLine& line);

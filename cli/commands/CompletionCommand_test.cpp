@@ -47,5 +47,15 @@ TEST(CompletionScript, WorksInBash) {
   EXPECT_EQ(std::system(("bash -c '" + script + "'").c_str()), 0);
 }
 
+TEST(CompletionScript, KnowsInterfacesThatAreGoneAndHaveAFile) {
+  const TestHost host;
+  host.directory().write("data/ifcfg-eth0", "");
+  host.directory().write("data/ifcfg-gone0", "");
+  EXPECT_EQ(shown(host, {"complete", "--", "ifcfg", "adopt", ""}), "gone0\n");
+  EXPECT_EQ(shown(host, {"complete", "--", "ifcfg", "adopt", "gone0", ""}), "eth0\neth1\n");
+  EXPECT_EQ(shown(host, {"complete", "--", "check", "eth"}), "eth0\neth1\n");
+  EXPECT_EQ(shown(host, {"complete", "--", "show", "eth0", "eth1"}), "eth1\n");
+}
+
 }  // namespace
 }  // namespace zorva::cli

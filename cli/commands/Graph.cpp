@@ -11,6 +11,7 @@
 #include "cli/output/Text.h"
 #include "cli/output/ValueText.h"
 #include "cli/session/HostView.h"
+#include "cli/session/Problems.h"
 #include "util/Names.h"
 
 namespace zorva::cli {

@@ -35,7 +35,7 @@ TEST(Graph, ShowsWhatIsThereWithoutTheCompanionLibrary) {
     EXPECT_THAT(outcome.err, AllOf(StartsWith("zorvactl: warning: ZORVA_ComputerSystem, ZORVA_SPComputerSystem, "),
                                    HasSubstr("\nzorvactl: warning: associations of ZORVA_DNSProtocolEndPoint eth0, ")));
     EXPECT_EQ(std::count(outcome.err.begin(), outcome.err.end(), '\n'), 2) << outcome.err;
-    EXPECT_THAT(shown(host, {"show", "--provider-dir", directory}),
+    EXPECT_THAT(shown(host, {"classes", "--provider-dir", directory}),
                 AllOf(HasSubstr("ZORVA_ComputerSystem                    - "),
                       HasSubstr("ZORVA_DNSProtocolEndPoint               2 ")));
   }

@@ -1,6 +1,8 @@
-// show, classes.
+// show.
 
+#include <algorithm>
 #include <string>
+#include <vector>
 
 #include "cli/commands/Commands.h"
 #include "cli/commands/ViewJson.h"
@@ -9,151 +11,191 @@
 #include "cli/output/Text.h"
 #include "cli/session/HostView.h"
 #include "cli/session/Session.h"
+#include "cli/session/SettingFiles.h"
 
 namespace zorva::cli {
 
 namespace {
 
-struct CountOptions {
-  bool all = false;  ///< whatever time it takes
+struct ShowOptions {
+  std::vector<std::string> names;
+  bool all = false;  ///< also interfaces without DNS of their own
 };
 
 std::string orDash(const std::string& text) { return text.empty() ? "-" : text; }
 
-Style styleOfState(const EndpointRow& row) {
+Style styleOfState(const InterfaceRow& row) {
   // CIM_EnabledLogicalElement.EnabledState: 2 Enabled, 3 Disabled.
   if (row.stateNumber == 2) return Style::Good;
   return row.stateNumber == 3 ? Style::Bad : Style::Warning;
 }
 
-/// A part of the view; without rows it says why there are none.
-void writeSection(const std::string& heading, const Table& table, const std::string& whenEmpty, bool couldAsk,
-                  const Layout& layout) {
-  write(styled(heading, Style::Heading, layout) + "\n");
-  write(table.empty() ? (couldAsk ? "  " + whenEmpty : std::string("  -")) + "\n" : table.text(layout));
-  write("\n");
+Style styleOfSource(SettingSource source) {
+  if (source == SettingSource::File) return Style::Good;
+  return source == SettingSource::Set ? Style::Warning : Style::Plain;
 }
 
-Table endpointTable(const HostView& view) {
-  Table table({"NAME", "STATE", "HOST NAME", "DOMAIN", "SUFFIXES", "SYSTEM"}, 2);
-  for (const EndpointRow& row : view.endpoints) {
-    table.add({orDash(row.name), Cell(orDash(row.state), styleOfState(row)), orDash(row.hostName),
-               orDash(row.domainName), orDash(joined(row.suffixes, " ")), orDash(row.system)});
+std::string labelOf(const InterfaceRow& row) { return orDash(row.name) + (row.isServiceProcessor ? " (BMC)" : ""); }
+
+/// One line for each interface: the servers are cut last.
+Table interfaceTable(const std::vector<const InterfaceRow*>& rows, bool hasSources) {
+  std::vector<std::string> headings{"NAME", "STATE", "SERVERS", "DOMAIN", "SUFFIXES"};
+  std::vector<Narrowing> narrowing{{4, 8}, {3, 11}, {2, 18}, {0, 12}};
+  if (hasSources) {
+    headings.emplace_back("FROM");
+    narrowing.insert(narrowing.begin() + 1, {5, 16});
+  }
+  Table table(std::move(headings));
+  table.keepRowsOnOneLine(std::move(narrowing));
+  for (const InterfaceRow* row : rows) {
+    std::vector<Cell> cells{labelOf(*row), Cell(orDash(row->state), styleOfState(*row)), Cell::list(row->servers),
+                            orDash(row->domainName), Cell::list(row->suffixes)};
+    if (hasSources) cells.emplace_back(orDash(row->from()), styleOfSource(row->source));
+    table.add(std::move(cells));
   }
   return table;
 }
 
-Table serverTable(const HostView& view) {
-  Table table({"ORDER", "ADDRESS"}, 2);
-  for (const ServerRow& row : view.servers) table.add({std::to_string(row.order), row.address});
-  return table;
+void writeWrapped(const std::string& text, const Layout& layout) {
+  for (const std::string& line : wrapped(printable(text), layout.width)) write(line + "\n");
 }
 
-Style styleOfSource(SettingSource source) {
-  if (source == SettingSource::File) return Style::Good;
-  return source == SettingSource::Set ? Style::Warning : Style::Faint;
+std::vector<const InterfaceRow*> shownRows(const HostView& view, bool all) {
+  std::vector<const InterfaceRow*> rows;
+  for (const InterfaceRow& row : view.interfaces) {
+    if (all || row.hasDns()) rows.push_back(&row);
+  }
+  if (!rows.empty()) return rows;
+  for (const InterfaceRow& row : view.interfaces) rows.push_back(&row);
+  return rows;
+}
+
+void writeInterfaces(const HostView& view, bool all, const Layout& layout) {
+  const std::vector<const InterfaceRow*> rows = shownRows(view, all);
+  if (rows.empty()) {
+    const bool couldAsk = view.couldAsk(kEndpointClass);
+    writeWrapped(couldAsk ? "no interface: this host has none besides loopback" : "-", layout);
+    return;
+  }
+  write(interfaceTable(rows, view.hasSources).text(layout));
+  const std::size_t left = view.interfaces.size() - rows.size();
+  if (left == 1) writeWrapped("1 interface without DNS of its own is left out; --all shows it", layout);
+  if (left > 1) {
+    writeWrapped(std::to_string(left) + " interfaces without DNS of their own are left out; --all shows them", layout);
+  }
+}
+
+void writeHost(const HostView& view, const Layout& layout) {
+  const HostRow& host = view.host;
+  Table table({}, 2);
+  table.keepRowsOnOneLine({{1, 20}});
+  const auto add = [&table](const std::string& label, const std::vector<std::string>& texts) {
+    if (!texts.empty()) table.add({label, Cell::list(texts)});
+  };
+  write("\n" + styled("Host", Style::Heading, layout) + "\n");
+  add("programs ask", host.resolverServers);
+  add("never asked", host.resolverNotAsked);
+  add("search list", host.resolverSearch);
+  add("options", host.resolverOptions);
+  add(orDash(host.facts.owner) + " asks", host.servers);
+  table.add({"suffixes", view.couldAsk(kGeneralSettingClass) ? Cell::list(host.suffixes) : Cell("-")});
+  write(table.text(layout));
+  if (!host.place().empty()) writeWrapped("The suffixes are " + host.place() + ".", layout);
 }
 
 Table settingTable(const std::vector<SettingRow>& rows, bool hasSources) {
-  std::vector<std::string> headings{"INTERFACE", "SETTING", "VALUE"};
-  if (hasSources) headings.emplace_back("FROM");
-  Table table(headings, 2);
-  const std::string* before = nullptr;
+  std::vector<std::string> headings{"SETTING", "VALUE"};
+  if (hasSources) headings.insert(headings.begin() + 1, "FROM");
+  Table table(std::move(headings), 2);
   for (const SettingRow& row : rows) {
-    const bool isSame = before != nullptr && *before == row.interface;
-    std::vector<Cell> cells{isSame ? "" : orDash(row.interface), row.setting, orDash(joined(row.values, " "))};
-    if (hasSources) cells.emplace_back(sourceName(row.source), styleOfSource(row.source));
-    table.add(std::move(cells));
-    before = &row.interface;
-  }
-  return table;
-}
-
-Table classTable(const std::vector<ClassRow>& rows) {
-  const bool hasProviders = !rows.empty() && !rows.front().provider.empty();
-  std::vector<std::string> headings{"CLASS", "INSTANCES"};
-  if (hasProviders) headings.insert(headings.end(), {"PROVIDER", "LIBRARY"});
-  Table table(headings, 2);
-  for (const ClassRow& row : rows) {
-    std::vector<Cell> cells{row.name, row.count ? Cell(std::to_string(*row.count)) : Cell("-", Style::Faint)};
-    if (hasProviders) cells.insert(cells.end(), {row.provider, row.library});
+    std::vector<Cell> cells{row.setting, orDash(joined(row.values, " "))};
+    if (hasSources) cells.insert(cells.begin() + 1, Cell(sourceName(row.source), styleOfSource(row.source)));
     table.add(std::move(cells));
   }
   return table;
 }
 
-void tellUncounted(const std::vector<ClassRow>& rows) {
-  if (isUncounted(rows))
-    tellNote("the associations of so many objects are not counted; --all counts them, which takes long");
+/// All of one interface, with everything in full.
+void writeInterface(const InterfaceRow& row, bool hasSources, const Layout& layout) {
+  const OwnerFacts& facts = row.facts;
+  Table table({}, 2);
+  const auto addText = [&table](const char* label, const std::string& text) {
+    if (!text.empty()) table.add({label, text});
+  };
+  const auto addList = [&table](const char* label, const std::vector<std::string>& texts) {
+    for (std::size_t i = 0; i < texts.size(); ++i) table.add({i == 0 ? label : "", texts[i]});
+  };
+  const auto addOwnList = [&](const char* label, const std::vector<std::string>& texts) {
+    addList(label, texts.empty() ? std::vector<std::string>{"-"} : texts);
+  };
+  write(styled(printable(labelOf(row)), Style::Heading, layout) + "\n");
+  table.add({"state", Cell(orDash(row.state), styleOfState(row))});
+  if (hasSources) table.add({"from", Cell(orDash(row.from()), styleOfSource(row.source))});
+  addText("owner", facts.owner);
+  addText("profile", facts.profile);
+  addText("origin", facts.origin);
+  addOwnList("servers", row.servers);
+  addList("servers in full", facts.serversInFull);
+  addList("servers of the host", row.hostServers);
+  table.add({"domain", orDash(row.domainName)});
+  addOwnList("suffixes", row.suffixes);
+  addList("routing domains", facts.routingDomains);
+  addText("default route", facts.defaultRoute);
+  addText("DNS over TLS", facts.dnsOverTls);
+  addText("DNSSEC", facts.dnssec);
+  addText("LLMNR", facts.llmnr);
+  addText("multicast DNS", facts.multicastDns);
+  addText("host name", row.hostName);
+  addText("system", row.system);
+  write(table.text(layout) + "\n" + settingTable(row.settings, hasSources).text(layout));
 }
 
-HostView viewOf(Session& session, bool countsAll) {
+HostView viewOf(Session& session) {
   Progress progress;
-  return readHostView(session, progress, countsAll);
+  return readHostView(session, progress);
 }
 
-std::vector<ClassRow> classesOf(Session& session, bool countsAll) {
-  Progress progress;
-  return readClassRows(session, progress, countsAll);
+void writeView(const HostView& view, const ShowOptions& options, const Layout& layout) {
+  if (!options.names.empty()) {
+    for (const InterfaceRow& row : view.interfaces) {
+      if (&row != &view.interfaces.front()) write("\n");
+      writeInterface(row, view.hasSources, layout);
+    }
+    return;
+  }
+  write("DNS client configuration of " + styled(printable(view.systemName), Style::Heading, layout) + "\n\n");
+  writeInterfaces(view, options.all, layout);
+  writeHost(view, layout);
 }
 
-void showHost(const Globals& globals, const CountOptions& options) {
+void showHost(const Globals& globals, const ShowOptions& options) {
   requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "show");
   Session session(globals);
-  const HostView view = viewOf(session, options.all);
-  tellUncounted(view.classes);
+  HostView view = viewOf(session);
+  if (!options.names.empty() && view.couldAsk(kEndpointClass)) keepOnly(view, options.names);
   if (globals.output == OutputFormat::Json) {
     write(hostViewJson(view) + "\n");
-    return;
+  } else {
+    writeView(view, options, session.layout());
   }
-  const Layout& layout = session.layout();
-  write("DNS client configuration of " + styled(printable(view.systemName), Style::Heading, layout) + "\n\n");
-  writeSection("Endpoints", endpointTable(view), "none: this host has no network interface besides loopback",
-               view.couldAsk(kEndpointClass), layout);
-  writeSection("Servers, in search order", serverTable(view), "none configured", view.couldAsk(kServerClass), layout);
-  writeSection("Settings of each interface", settingTable(view.interfaceSettings, view.hasSources), "none",
-               view.couldAsk(kSettingClass), layout);
-  writeSection("Settings of the host", settingTable(view.hostSettings, view.hasSources), "none",
-               view.couldAsk(kGeneralSettingClass), layout);
-  writeSection("Classes", classTable(view.classes), "none", true, layout);
   for (const Problem& problem : view.problems) tellWarning(problemText(problem));
-}
-
-void listClasses(const Globals& globals, const CountOptions& options) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "classes");
-  Session session(globals);
-  const std::vector<ClassRow> rows = classesOf(session, options.all);
-  tellUncounted(rows);
-  if (globals.output == OutputFormat::Json) {
-    write(classRowsJson(rows) + "\n");
-    return;
-  }
-  write(classTable(rows).text(session.layout()));
-  for (const Problem& problem : problemsOf(rows)) tellWarning(problemText(problem));
-}
-
-void registerCounting(Subcommand& subcommand, void (*command)(const Globals& globals, const CountOptions& options)) {
-  const auto options = std::make_shared<CountOptions>();
-  subcommand.writes({OutputFormat::Table, OutputFormat::Json})
-      .flag("--all", "Count the associations of a host with very many interfaces, too; takes long", options->all)
-      .runs<CountOptions>(command, options);
+  warnOfOrphans(session);
 }
 
 }  // namespace
 
 void addShowCommand(CommandLine& line) {
-  Subcommand show = line.add("show", "The endpoints, servers and settings of this host at a glance");
-  show.examples(
-      "  zorvactl show\n"
-      "  zorvactl show --output json\n"
-      "  zorvactl show --url http://localhost:5988/root/cimv2");
-  registerCounting(show, showHost);
-}
-
-void addClassesCommand(CommandLine& line) {
-  Subcommand classes = line.add("classes", "The classes with their providers and instance counts");
-  classes.examples("  zorvactl classes");
-  registerCounting(classes, listClasses);
+  const auto options = std::make_shared<ShowOptions>();
+  line.add("show", "The DNS servers and domains of each interface, and who says so")
+      .writes({OutputFormat::Table, OutputFormat::Json})
+      .examples(
+          "  zorvactl show\n"
+          "  zorvactl show eth0                            all of one\n"
+          "  zorvactl show --output json\n"
+          "  zorvactl show --url http://localhost:5988/root/cimv2")
+      .flag("--all", "Show interfaces without DNS of their own as well", options->all)
+      .words("NAME", "An interface; of each the whole is shown", Many::Any, options->names, "INTERFACE")
+      .runs<ShowOptions>(showHost, options);
 }
 
 }  // namespace zorva::cli

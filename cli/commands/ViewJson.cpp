@@ -35,20 +35,8 @@ Json ofClassRows(const std::vector<ClassRow>& rows) {
   return list;
 }
 
-Json ofEndpoint(const EndpointRow& row) {
-  Json entry;
-  entry["name"] = asUtf8(row.name);
-  entry["system"] = asUtf8(row.system);
-  entry["state"] = row.stateNumber ? Json(*row.stateNumber) : Json(nullptr);
-  entry["host_name"] = asUtf8(row.hostName);
-  entry["domain_name"] = asUtf8(row.domainName);
-  entry["suffixes"] = ofTexts(row.suffixes);
-  return entry;
-}
-
 Json ofSetting(const SettingRow& row, bool hasSources) {
   Json entry;
-  entry["interface"] = asUtf8(row.interface);
   entry["setting"] = row.setting;
   entry["value"] = row.isList ? ofTexts(row.values) : Json(asUtf8(row.values.empty() ? "" : row.values.front()));
   if (hasSources) entry["from"] = row.source == SettingSource::None ? Json(nullptr) : Json(sourceName(row.source));
@@ -62,19 +50,113 @@ Json ofRows(const std::vector<Row>& rows, Convert convert) {
   return list;
 }
 
+Json orNull(const std::string& text) { return text.empty() ? Json(nullptr) : Json(asUtf8(text)); }
+
+/// The fields that the tree has under the same names; null where nobody says.
+void addFacts(Json& entry, const OwnerFacts& facts) {
+  entry["dns_owner"] = orNull(facts.owner);
+  entry["dns_profile"] = orNull(facts.profile);
+  entry["dns_origin"] = orNull(facts.origin);
+  entry["dns_servers_in_full"] = ofTexts(facts.serversInFull);
+  entry["dns_routing_domains"] = ofTexts(facts.routingDomains);
+  entry["dns_default_route"] = orNull(facts.defaultRoute);
+  entry["dns_over_tls"] = orNull(facts.dnsOverTls);
+  entry["dnssec"] = orNull(facts.dnssec);
+  entry["llmnr"] = orNull(facts.llmnr);
+  entry["multicast_dns"] = orNull(facts.multicastDns);
+}
+
+Json ofSettings(const std::vector<SettingRow>& rows, bool hasSources) {
+  return ofRows(rows, [hasSources](const SettingRow& row) { return ofSetting(row, hasSources); });
+}
+
+Json ofInterface(const InterfaceRow& row, bool hasSources) {
+  Json entry;
+  entry["name"] = asUtf8(row.name);
+  entry["system"] = asUtf8(row.system);
+  entry["state"] = row.stateNumber ? Json(*row.stateNumber) : Json(nullptr);
+  entry["from"] = hasSources ? orNull(row.from()) : Json(nullptr);
+  entry["servers"] = ofTexts(row.servers);
+  entry["domain_name"] = asUtf8(row.domainName);
+  entry["suffixes"] = ofTexts(row.suffixes);
+  entry["host_name"] = asUtf8(row.hostName);
+  entry["endpoint_domain_name"] = asUtf8(row.endpointDomain);
+  entry["host_servers"] = row.source == SettingSource::File ? ofTexts(row.hostServers) : Json(nullptr);
+  addFacts(entry, row.facts);
+  entry["settings"] = ofSettings(row.settings, hasSources);
+  return entry;
+}
+
+Json ofHost(const HostRow& host, bool hasSources) {
+  Json entry;
+  entry["interface"] = orNull(host.interface);
+  entry["place"] = orNull(host.place());
+  entry["suffixes"] = ofTexts(host.suffixes);
+  entry["dns_server_addresses"] = ofTexts(host.servers);
+  entry["dns_suffixes"] = ofTexts(host.ownSuffixes);
+  addFacts(entry, host.facts);
+  entry["resolver_servers"] = ofTexts(host.resolverServers);
+  entry["resolver_servers_not_asked"] = ofTexts(host.resolverNotAsked);
+  entry["resolver_search"] = ofTexts(host.resolverSearch);
+  entry["resolver_options"] = ofTexts(host.resolverOptions);
+  entry["settings"] = ofSettings(host.settings, hasSources);
+  return entry;
+}
+
 }  // namespace
 
 std::string hostViewJson(const HostView& view) {
   Json json;
   json["system"] = asUtf8(view.systemName);
-  json["endpoints"] = ofRows(view.endpoints, ofEndpoint);
-  json["servers"] = ofRows(view.servers, [](const ServerRow& row) {
-    return Json{{"order", row.order}, {"address", asUtf8(row.address)}};
+  json["interfaces"] =
+      ofRows(view.interfaces, [&](const InterfaceRow& row) { return ofInterface(row, view.hasSources); });
+  json["host"] = ofHost(view.host, view.hasSources);
+  return dumped(json);
+}
+
+namespace {
+
+const char* outcomeWord(dns::Answer::Kind kind) noexcept {
+  switch (kind) {
+    case dns::Answer::Kind::Response:
+      return "response";
+    case dns::Answer::Kind::Malformed:
+      return "malformed";
+    case dns::Answer::Kind::Unreachable:
+      return "unreachable";
+    case dns::Answer::Kind::None:
+      break;
+  }
+  return "no answer";
+}
+
+Json ofCheckedServer(const CheckedServer& server) {
+  const bool isResponse = server.answer.kind == dns::Answer::Kind::Response;
+  Json entry;
+  entry["server"] = asUtf8(server.server);
+  entry["used_by"] = ofTexts(server.usedBy);
+  entry["never_asked_by"] = ofTexts(server.neverAskedBy);
+  entry["outcome"] = outcomeWord(server.answer.kind);
+  entry["code"] = isResponse ? Json(dns::codeName(server.answer.response.code)) : Json(nullptr);
+  entry["time_ms"] = isResponse ? Json(static_cast<double>(server.answer.time.count()) / 1000) : Json(nullptr);
+  entry["problem"] = orNull(server.answer.problem);
+  return entry;
+}
+
+}  // namespace
+
+std::string checkJson(const CheckResult& result) {
+  Json json;
+  json["question"] = Json{{"name", result.question.name}, {"type", dns::typeName(result.question.type)}};
+  json["servers"] = ofRows(result.servers, ofCheckedServer);
+  json["suffixes"] = ofRows(result.suffixes, [](const CheckedSuffix& suffix) {
+    Json entry;
+    entry["suffix"] = asUtf8(suffix.suffix);
+    entry["used_by"] = ofTexts(suffix.usedBy);
+    entry["resolves"] = suffix.resolves ? Json(*suffix.resolves) : Json(nullptr);
+    return entry;
   });
-  const auto setting = [&view](const SettingRow& row) { return ofSetting(row, view.hasSources); };
-  json["interface_settings"] = ofRows(view.interfaceSettings, setting);
-  json["host_settings"] = ofRows(view.hostSettings, setting);
-  json["classes"] = ofClassRows(view.classes);
+  json["problems"] = ofTexts(result.problems);
   return dumped(json);
 }
 
@@ -87,6 +169,18 @@ std::string settingFileJson(const std::string& path, const std::vector<SettingLi
   return dumped(json);
 }
 
+std::string listedFilesJson(const std::vector<ListedFile>& files) {
+  return dumped(ofRows(files, [](const ListedFile& file) {
+    Json entry;
+    entry["file"] = asUtf8(file.path);
+    entry["interface"] = asUtf8(file.interface);
+    entry["exists"] = !file.isOrphan;
+    entry["keys"] = ofTexts(file.keys);
+    entry["problem"] = orNull(file.problem);
+    return entry;
+  }));
+}
+
 std::string overlayJson(const std::vector<OverlayRow>& rows) {
   return dumped(ofRows(rows, [](const OverlayRow& row) {
     Json entry;
@@ -96,6 +190,8 @@ std::string overlayJson(const std::vector<OverlayRow>& rows) {
     return entry;
   }));
 }
+
+std::string countJson(const char* name, std::size_t count) { return dumped(Json{{name, count}}); }
 
 std::string applyResultsJson(const std::vector<zorva::agent::ApplyResult>& results) {
   return dumped(ofRows(results, [](const zorva::agent::ApplyResult& result) {

@@ -45,27 +45,27 @@ bool isSet(const char* variable) noexcept {
   return value != nullptr && *value != '\0';
 }
 
-/// The lines of one row, its fields wrapped into their columns.
-void appendRow(std::string& out, const std::vector<Cell>& row, const std::vector<std::size_t>& widths,
-               std::size_t indent, const Layout& layout) {
-  std::vector<std::vector<std::string>> columns;
-  std::size_t height = 1;
-  for (std::size_t i = 0; i < row.size(); ++i) {
-    columns.push_back(wrapped(row[i].text, widths[i]));
-    height = std::max(height, columns.back().size());
-  }
-  for (std::size_t line = 0; line < height; ++line) {
-    std::string blanks(indent, ' ');
-    for (std::size_t i = 0; i < columns.size(); ++i) {
-      std::string_view piece = line < columns[i].size() ? std::string_view(columns[i][line]) : std::string_view();
-      piece = piece.substr(0, piece.find_last_not_of(' ') + 1);
-      // Blanks are written only before the next text, so that no line ends in them.
-      if (!piece.empty()) out += blanks + styled(piece, row[i].style, layout);
-      if (!piece.empty()) blanks.clear();
-      blanks.append(widths[i] + kGap - std::min(widths[i], displayWidth(piece)), ' ');
+/// A list on one line is not wider than this where nothing limits the line.
+constexpr std::size_t kWidestList = 60;
+
+/// Narrows the widest columns until the line fits.
+void narrowWidest(std::vector<std::size_t>& widths, std::size_t total, std::size_t wanted) {
+  while (total > wanted) {
+    const auto widest = std::max_element(widths.begin(), widths.end());
+    if (*widest <= kNarrowest) break;
+    // Down to the next widest column at once, so that even a text of a megabyte takes few rounds.
+    std::size_t next = kNarrowest;
+    for (auto width = widths.begin(); width != widths.end(); ++width) {
+      if (width != widest && *width < *widest) next = std::max(next, *width);
     }
-    out += '\n';
+    const std::size_t cut = std::min(total - wanted, std::max<std::size_t>(*widest - next, 1));
+    *widest -= cut;
+    total -= cut;
   }
+}
+
+std::vector<std::string> onOneLine(const Cell& cell, std::size_t width) {
+  return {cell.elements.empty() ? cutTo(cell.text, width) : firstOf(cell.elements, width)};
 }
 
 }  // namespace
@@ -88,16 +88,36 @@ Table::Table(std::vector<std::string> headings, std::size_t indent) : indent_(in
   for (std::string& heading : headings) headings_.emplace_back(std::move(heading), Style::Heading);
 }
 
+Cell Cell::list(std::vector<std::string> elements, Style look) {
+  Cell cell(elements.empty() ? "-" : joined(elements, " "), look);
+  cell.elements = std::move(elements);
+  return cell;
+}
+
 void Table::add(std::vector<Cell> row) {
-  for (Cell& cell : row) cell.text = printable(cell.text);
+  for (Cell& cell : row) {
+    cell.text = printable(cell.text);
+    for (std::string& element : cell.elements) element = printable(element);
+  }
   rows_.push_back(std::move(row));
+}
+
+void Table::keepRowsOnOneLine(std::vector<Narrowing> order) {
+  isOneLine_ = true;
+  narrowing_ = std::move(order);
+}
+
+std::size_t Table::naturalWidth(const Cell& cell, const Layout& layout) const {
+  const std::size_t width = displayWidth(cell.text);
+  const bool isLimited = isOneLine_ && layout.width == 0 && !cell.elements.empty();
+  return isLimited ? std::min(width, kWidestList) : width;
 }
 
 std::vector<std::size_t> Table::columnWidths(const Layout& layout) const {
   std::vector<std::size_t> widths;
-  const auto widen = [&widths](const std::vector<Cell>& row) {
+  const auto widen = [&](const std::vector<Cell>& row) {
     if (widths.size() < row.size()) widths.resize(row.size());
-    for (std::size_t i = 0; i < row.size(); ++i) widths[i] = std::max(widths[i], displayWidth(row[i].text));
+    for (std::size_t i = 0; i < row.size(); ++i) widths[i] = std::max(widths[i], naturalWidth(row[i], layout));
   };
   widen(headings_);
   for (const std::vector<Cell>& row : rows_) widen(row);
@@ -105,26 +125,44 @@ std::vector<std::size_t> Table::columnWidths(const Layout& layout) const {
 
   std::size_t total = indent_ + kGap * (widths.size() - 1);
   for (const std::size_t width : widths) total += width;
-  while (total > layout.width) {
-    const auto widest = std::max_element(widths.begin(), widths.end());
-    if (*widest <= kNarrowest) break;
-    // Down to the next widest column at once, so that even a text of a megabyte takes few rounds.
-    std::size_t next = kNarrowest;
-    for (auto width = widths.begin(); width != widths.end(); ++width) {
-      if (width != widest && *width < *widest) next = std::max(next, *width);
-    }
-    const std::size_t cut = std::min(total - layout.width, std::max<std::size_t>(*widest - next, 1));
-    *widest -= cut;
+  for (const Narrowing& each : narrowing_) {
+    if (total <= layout.width || each.column >= widths.size() || widths[each.column] <= each.least) continue;
+    const std::size_t cut = std::min(total - layout.width, widths[each.column] - each.least);
+    widths[each.column] -= cut;
     total -= cut;
   }
+  narrowWidest(widths, total, layout.width);
   return widths;
+}
+
+/// The lines of one row.
+void Table::appendRow(std::string& out, const std::vector<Cell>& row, const std::vector<std::size_t>& widths,
+                      const Layout& layout) const {
+  std::vector<std::vector<std::string>> columns;
+  std::size_t height = 1;
+  for (std::size_t i = 0; i < row.size(); ++i) {
+    columns.push_back(isOneLine_ ? onOneLine(row[i], widths[i]) : wrapped(row[i].text, widths[i]));
+    height = std::max(height, columns.back().size());
+  }
+  for (std::size_t line = 0; line < height; ++line) {
+    std::string blanks(indent_, ' ');
+    for (std::size_t i = 0; i < columns.size(); ++i) {
+      std::string_view piece = line < columns[i].size() ? std::string_view(columns[i][line]) : std::string_view();
+      piece = piece.substr(0, piece.find_last_not_of(' ') + 1);
+      // Blanks are written only before the next text, so that no line ends in them.
+      if (!piece.empty()) out += blanks + styled(piece, row[i].style, layout);
+      if (!piece.empty()) blanks.clear();
+      blanks.append(widths[i] + kGap - std::min(widths[i], displayWidth(piece)), ' ');
+    }
+    out += '\n';
+  }
 }
 
 std::string Table::text(const Layout& layout) const {
   const std::vector<std::size_t> widths = columnWidths(layout);
   std::string out;
-  if (!headings_.empty()) appendRow(out, headings_, widths, indent_, layout);
-  for (const std::vector<Cell>& row : rows_) appendRow(out, row, widths, indent_, layout);
+  if (!headings_.empty()) appendRow(out, headings_, widths, layout);
+  for (const std::vector<Cell>& row : rows_) appendRow(out, row, widths, layout);
   return out;
 }
 

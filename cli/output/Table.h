@@ -29,10 +29,21 @@ std::string styled(std::string_view text, Style style, const Layout& layout);
 struct Cell {
   std::string text;
   Style style = Style::Plain;
+  std::vector<std::string> elements;  ///< of a list, which the text then is
 
   Cell(std::string content = {}, Style look = Style::Plain)  // NOLINT(google-explicit-constructor)
       : text(std::move(content)), style(look) {}
   Cell(const char* content) : text(content) {}  // NOLINT(google-explicit-constructor)
+
+  /// A list with blanks between its elements; a dash if it is empty. Where a row must fit on a line, it ends in "and 3
+  /// more".
+  static Cell list(std::vector<std::string> elements, Style look = Style::Plain);
+};
+
+/// How far a column may be narrowed.
+struct Narrowing {
+  std::size_t column;
+  std::size_t least;
 };
 
 /// Rows of fields below headings. Columns are as wide as their widest field. If that is too much for the terminal, the
@@ -47,15 +58,24 @@ class Table {
 
   bool empty() const noexcept { return rows_.empty(); }
 
+  /// Puts each row on one line: a field that is too wide is cut, also a list where there is no terminal. These columns
+  /// are narrowed first, in this order.
+  void keepRowsOnOneLine(std::vector<Narrowing> order);
+
   /// The lines, each ended by a line feed and without blanks at its end.
   std::string text(const Layout& layout) const;
 
  private:
   std::vector<std::size_t> columnWidths(const Layout& layout) const;
+  std::size_t naturalWidth(const Cell& cell, const Layout& layout) const;
+  void appendRow(std::string& out, const std::vector<Cell>& row, const std::vector<std::size_t>& widths,
+                 const Layout& layout) const;
 
   std::vector<Cell> headings_;
   std::size_t indent_;
   std::vector<std::vector<Cell>> rows_;
+  bool isOneLine_ = false;
+  std::vector<Narrowing> narrowing_;
 };
 
 }  // namespace zorva::cli

@@ -67,5 +67,24 @@ TEST(Table, ColoursOnlyWhereColoursAreShown) {
   EXPECT_EQ(table.text({0, false}), "H\nok\n");
 }
 
+TEST(Table, CutsRowsToOneLine) {
+  Table table({"NAME", "SERVERS", "FROM"});
+  table.keepRowsOnOneLine({{2, 8}});
+  table.add({"eth0", Cell::list({"192.0.2.1", "192.0.2.2", "192.0.2.3", "192.0.2.4"}), "a long description"});
+  table.add({"eth1", Cell::list({}), "x"});
+  EXPECT_EQ(table.text({40, false}),
+            "NAME  SERVERS                   FROM\n"
+            "eth0  192.0.2.1 and 3 more      a long \u2026\n"
+            "eth1  -                         x\n");
+}
+
+TEST(Table, CutsALongListAlsoWhereThereIsNoTerminal) {
+  Table table;
+  table.keepRowsOnOneLine({});
+  table.add({Cell::list(std::vector<std::string>(1000, "192.0.2.1")), std::string(100, 'x')});
+  EXPECT_EQ(table.text({}),
+            "192.0.2.1 192.0.2.1 192.0.2.1 192.0.2.1 and 996 more          " + std::string(100, 'x') + "\n");
+}
+
 }  // namespace
 }  // namespace zorva::cli

@@ -63,6 +63,8 @@ std::size_t pieceEnd(std::string_view text, std::size_t width) {
   return at;
 }
 
+std::string moreText(std::size_t count) { return " and " + std::to_string(count) + " more"; }
+
 }  // namespace
 
 std::string printable(std::string_view text) {
@@ -115,6 +117,31 @@ std::vector<std::string> wrapped(std::string_view text, std::size_t width) {
     text.remove_prefix(next);
   }
   return lines;
+}
+
+std::string cutTo(std::string_view text, std::size_t width) {
+  if (width == 0 || displayWidth(text) <= width) return std::string(text);
+  // A first character that is wider than the room leaves nothing of the text.
+  const std::string_view piece = text.substr(0, width == 1 ? 0 : pieceEnd(text, width - 1));
+  return std::string(displayWidth(piece) < width ? piece : std::string_view()) + "\u2026";
+}
+
+std::string firstOf(const std::vector<std::string>& texts, std::size_t width) {
+  std::size_t used = 0;
+  std::size_t fitting = 0;  // the longest beginning of the list that leaves room for the rest's number
+  for (std::size_t i = 0; i < texts.size(); ++i) {
+    used += displayWidth(texts[i]) + (i == 0 ? 0 : 1);
+    if (width != 0 && used > width) break;
+    const std::size_t left = texts.size() - i - 1;
+    if (left == 0) return joined(texts, " ");
+    if (width == 0 || used + moreText(left).size() <= width) fitting = i + 1;
+  }
+  if (fitting > 0) {
+    const auto end = texts.begin() + static_cast<std::ptrdiff_t>(fitting);
+    return joined({texts.begin(), end}, " ") + moreText(texts.size() - fitting);
+  }
+  if (texts.size() == 1) return cutTo(texts.front(), width);
+  return texts.empty() ? std::string() : cutTo(std::to_string(texts.size()) + " in all", width);
 }
 
 std::string asUtf8(std::string_view text) {

@@ -22,6 +22,13 @@ std::size_t displayWidth(std::string_view text);
 /// wider than `width` has its own line. `width` 0 means no limit.
 std::vector<std::string> wrapped(std::string_view text, std::size_t width);
 
+/// A printable text in at most `width` columns: a wider one is cut and ends in an ellipsis. `width` 0 means no limit.
+std::string cutTo(std::string_view text, std::size_t width);
+
+/// The first of these printable texts, as many as fit in `width` columns with blanks between them and "and 3 more" at
+/// the end. Where not even the first fits: "4 in all", and a single one is cut. `width` 0 means no limit.
+std::string firstOf(const std::vector<std::string>& texts, std::size_t width);
+
 /// `text` for a document that must be UTF-8: an invalid byte becomes the character U+10EE00 plus the byte, as in the
 /// agent's own documents.
 std::string asUtf8(std::string_view text);

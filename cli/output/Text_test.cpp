@@ -61,6 +61,31 @@ TEST(Wrapped, TakesAMegabyteInItsStride) {
   EXPECT_EQ(lines.size(), (1U << 20U) / 8);
 }
 
+TEST(CutTo, EndsInAnEllipsisWhereSomethingIsMissing) {
+  EXPECT_EQ(cutTo("abc", 3), "abc");
+  EXPECT_EQ(cutTo("abcd", 3), "ab\u2026");
+  EXPECT_EQ(cutTo("abcd", 1), "\u2026");
+  EXPECT_EQ(cutTo("abcd", 0), "abcd");
+  EXPECT_EQ(cutTo("\xE7\xB6\xB2\xE8\xB7\xAF", 2), "\u2026") << "a wide character has no room beside it";
+}
+
+TEST(FirstOf, HasAsManyAsFitAndHowManyMoreThereAre) {
+  const Lines texts{"aaaa", "bbbb", "cccc", "dddd"};
+  EXPECT_EQ(firstOf(texts, 0), "aaaa bbbb cccc dddd");
+  EXPECT_EQ(firstOf(texts, 19), "aaaa bbbb cccc dddd");
+  EXPECT_EQ(firstOf(texts, 18), "aaaa and 3 more");
+  EXPECT_EQ(firstOf({"aaaa", "bbbb", "cccc", std::string(40, 'd')}, 25), "aaaa bbbb cccc and 1 more");
+  EXPECT_EQ(firstOf({"aaaa", "bbbb", "cccc", std::string(40, 'd')}, 24), "aaaa bbbb and 2 more");
+  EXPECT_EQ(firstOf(texts, 14), "4 in all");
+  EXPECT_EQ(firstOf({"aaaa"}, 3), "aa\u2026");
+  EXPECT_EQ(firstOf({}, 3), "");
+}
+
+TEST(FirstOf, IsNeverWiderThanItsRoom) {
+  const Lines texts(2000, "\xE7\xB6\xB2\xE8\xB7\xAF");
+  for (std::size_t width = 1; width < 100; ++width) EXPECT_LE(displayWidth(firstOf(texts, width)), width);
+}
+
 TEST(AsUtf8, MarksBytesThatAreNoUtf8AsTheAgentDoes) {
   EXPECT_EQ(asUtf8("a\xFF"), "a\xF4\x8E\xBB\xBF");  // U+10EE00 + 0xFF = U+10EEFF
   EXPECT_EQ(asUtf8("\xC3\xA9"), "\xC3\xA9");

@@ -1,19 +1,25 @@
 #include "cli/session/HostView.h"
 
-#include <sys/stat.h>
-
 #include <algorithm>
 #include <map>
+#include <memory>
 #include <string_view>
+#include <unordered_map>
+#include <unordered_set>
 #include <utility>
 
 #include "agent/Agent.h"
 #include "cli/output/Failure.h"
+#include "cli/output/Text.h"
 #include "cli/output/ValueText.h"
+#include "cli/session/SettingFiles.h"
 
 namespace zorva::cli {
 
 namespace {
+
+constexpr const char* kServiceProcessorClass = "ZORVA_SPComputerSystem";
+constexpr std::size_t kListedNames = 20;
 
 std::optional<std::uint64_t> numberOf(const broker::Instance& instance, std::string_view property) {
   const broker::Value* value = instance.property(property);
@@ -30,26 +36,31 @@ std::vector<std::string> textsOf(const broker::Value& value) {
   return texts;
 }
 
-EndpointRow endpointRow(const broker::Instance& instance) {
-  EndpointRow row;
-  row.name = propertyText(instance, "Name");
-  row.system = propertyText(instance, "SystemName");
-  row.hostName = propertyText(instance, "Hostname");
-  row.domainName = propertyText(instance, "DomainName");
-  if (const broker::Value* suffixes = instance.property("DNSSuffixesToAppend")) row.suffixes = textsOf(*suffixes);
+std::vector<std::string> textsOf(const broker::Instance& instance, std::string_view property) {
+  const broker::Value* value = instance.property(property);
+  return value == nullptr ? std::vector<std::string>() : textsOf(*value);
+}
+
+void readState(const broker::Instance& instance, InterfaceRow& row) {
   row.stateNumber = numberOf(instance, "EnabledState");
   const auto declared = std::find_if(instance.properties.begin(), instance.properties.end(),
                                      [](const broker::Property& property) { return property.name == "EnabledState"; });
-  if (row.stateNumber && declared != instance.properties.end() && declared->declaration != nullptr) {
-    const auto number = static_cast<std::int64_t>(*row.stateNumber);
-    row.state = valueWord(*declared->declaration, number).value_or(std::to_string(*row.stateNumber));
-  }
-  return row;
+  if (!row.stateNumber || declared == instance.properties.end() || declared->declaration == nullptr) return;
+  const auto number = static_cast<std::int64_t>(*row.stateNumber);
+  row.state = valueWord(*declared->declaration, number).value_or(std::to_string(*row.stateNumber));
 }
 
-bool fileStands(const std::string& interface) {
-  struct stat status {};
-  return ::stat((zorva::agent::dataDirectory() + "ifcfg-" + interface).c_str(), &status) == 0;
+InterfaceRow rowOfEndpoint(const broker::Instance& instance) {
+  InterfaceRow row;
+  row.name = propertyText(instance, "Name");
+  row.system = propertyText(instance, "SystemName");
+  row.isServiceProcessor = propertyText(instance, "SystemCreationClassName") == kServiceProcessorClass;
+  row.hostName = propertyText(instance, "Hostname");
+  row.endpointDomain = propertyText(instance, "DomainName");
+  row.domainName = row.endpointDomain;
+  row.suffixes = textsOf(instance, "DNSSuffixesToAppend");
+  readState(instance, row);
+  return row;
 }
 
 /// A setting that the providers read from a file or the host.
@@ -71,20 +82,6 @@ constexpr SettingName kHostSettings[] = {
     {"DNSSuffixesToAppend", true, ZV::NodeLexicon::PROP_DNS_SUFFIXES},
     {"ConfigurationName", false, kNoNumber},
 };
-
-/// The source of an interface's settings.
-struct Origin {
-  std::string interface;
-  const zorva::agent::Node* node = nullptr;  ///< null: not in the tree
-};
-
-/// Only the file counts if it exists: a key that it lacks is an empty value and not the host's.
-SettingSource sourceOf(const Origin& origin, zorva::agent::PropertyNumber number, bool hasValue) {
-  if (fileStands(origin.interface)) return SettingSource::File;
-  if (number == kNoNumber || !hasValue) return SettingSource::None;
-  const zorva::agent::Property* property = origin.node == nullptr ? nullptr : origin.node->find(number);
-  return property != nullptr && property->overlaid ? SettingSource::Set : SettingSource::Host;
-}
 
 /// The configurations of a tree by the names of their interfaces; the first of several with one name.
 class Configurations {
@@ -108,19 +105,69 @@ class Configurations {
   std::map<std::pair<bool, std::string_view>, const zorva::agent::Node*> byName_;
 };
 
+/// The tree and the files of this host.
+class LocalFacts {
+ public:
+  explicit LocalFacts(const Session& session)
+      : tree_(session.tree()), configurations_(*tree_), files_(findSettingFiles()) {}
+
+  const zorva::agent::TreeSnapshot& tree() const { return *tree_; }
+  const zorva::agent::Node* find(const std::string& interface, bool isServiceProcessor) const {
+    return configurations_.find(interface, isServiceProcessor);
+  }
+  bool hasFile(const std::string& interface) const { return files_.has(interface); }
+
+  /// Only the file counts if it exists: a key that it lacks is an empty value and not the host's. `node` may be null.
+  SettingSource sourceOf(const std::string& interface, const zorva::agent::Node* node,
+                         zorva::agent::PropertyNumber number, bool hasValue) const {
+    if (hasFile(interface)) return SettingSource::File;
+    if (number == kNoNumber || !hasValue) return SettingSource::None;
+    return node != nullptr && node->isOverlaid(number) ? SettingSource::Set : SettingSource::Host;
+  }
+
+ private:
+  std::shared_ptr<const zorva::agent::TreeSnapshot> tree_;
+  Configurations configurations_;
+  SettingFiles files_;
+};
+
 template <std::size_t Size>
-void addSettings(std::vector<SettingRow>& rows, const SettingName (&names)[Size], const broker::Instance& instance,
-                 const Origin* origin, const std::string& interface) {
+std::vector<SettingRow> settingsOf(const SettingName (&names)[Size], const broker::Instance& instance,
+                                   const std::string& interface, const LocalFacts* local, bool isServiceProcessor) {
+  const zorva::agent::Node* node = local == nullptr ? nullptr : local->find(interface, isServiceProcessor);
+  std::vector<SettingRow> rows;
   for (const SettingName& name : names) {
-    SettingRow row;
-    row.interface = interface;
-    row.setting = name.property;
-    row.isList = name.isList;
+    SettingRow row{interface, name.property, name.isList, textsOf(instance, name.property), SettingSource::None};
     const broker::Value* value = instance.property(name.property);
-    if (value != nullptr) row.values = textsOf(*value);
-    if (origin != nullptr) row.source = sourceOf(*origin, name.number, value != nullptr && !value->isNull);
+    const bool hasValue = value != nullptr && !value->isNull;
+    if (local != nullptr) row.source = local->sourceOf(interface, node, name.number, hasValue);
     rows.push_back(std::move(row));
   }
+  return rows;
+}
+
+std::string textOf(const zorva::agent::Node& node, zorva::agent::PropertyNumber number) {
+  const std::string* text = node.text(number);
+  return text == nullptr ? std::string() : *text;
+}
+
+std::vector<std::string> listOf(const zorva::agent::Node& node, zorva::agent::PropertyNumber number) {
+  const zorva::agent::StringList* list = node.list(number);
+  return list == nullptr ? std::vector<std::string>() : *list;
+}
+
+OwnerFacts ownerFacts(const zorva::agent::Node& node) {
+  using namespace zorva::agent;
+  return {textOf(node, kDnsOwner),
+          textOf(node, kDnsProfile),
+          textOf(node, kDnsOrigin),
+          listOf(node, kDnsServersInFull),
+          listOf(node, kDnsRoutingDomains),
+          textOf(node, kDnsDefaultRoute),
+          textOf(node, kDnsOverTls),
+          textOf(node, kDnssec),
+          textOf(node, kLlmnr),
+          textOf(node, kMulticastDns)};
 }
 
 /// The instances of a class; if they cannot be read, the view says why.
@@ -134,31 +181,113 @@ std::vector<broker::Instance> askedFor(Session& session, const char* className, 
   return instances;
 }
 
-void readServers(Session& session, HostView& view) {
-  for (const broker::Instance& instance : askedFor(session, kServerClass, view)) {
-    view.servers.push_back({numberOf(instance, "OrderOfAccess").value_or(0), propertyText(instance, "Name")});
+/// The rows of the interfaces by system and name. Several may have one name: each setting goes to the next of them.
+class RowsByName {
+ public:
+  explicit RowsByName(std::vector<InterfaceRow>& rows) : rows_(rows) {
+    for (std::size_t i = rows.size(); i > 0; --i) {
+      const InterfaceRow& row = rows[i - 1];
+      waiting_[keyOf(row.name, row.isServiceProcessor)].push_back(i - 1);
+    }
   }
-  std::stable_sort(view.servers.begin(), view.servers.end(),
-                   [](const ServerRow& a, const ServerRow& b) { return a.order < b.order; });
+
+  /// A new row if there is none left.
+  InterfaceRow& take(const std::string& name, bool isServiceProcessor) {
+    std::vector<std::size_t>& waiting = waiting_[keyOf(name, isServiceProcessor)];
+    if (waiting.empty()) {
+      rows_.emplace_back().name = name;
+      rows_.back().isServiceProcessor = isServiceProcessor;
+      return rows_.back();
+    }
+    const std::size_t index = waiting.back();
+    waiting.pop_back();
+    return rows_[index];
+  }
+
+ private:
+  static std::string keyOf(const std::string& name, bool isServiceProcessor) {
+    return (isServiceProcessor ? 'B' : 'C') + name;
+  }
+
+  std::vector<InterfaceRow>& rows_;
+  std::unordered_map<std::string, std::vector<std::size_t>> waiting_;
+};
+
+const SettingRow* settingNamed(const std::vector<SettingRow>& rows, std::string_view name) {
+  const auto found =
+      std::find_if(rows.begin(), rows.end(), [name](const SettingRow& row) { return row.setting == name; });
+  return found == rows.end() ? nullptr : &*found;
 }
 
-void readSettings(Session& session, HostView& view) {
-  const auto tree = session.isRemote() ? nullptr : session.tree();
-  std::optional<Configurations> configurations;
-  if (tree != nullptr) configurations.emplace(*tree);
-  for (const broker::Instance& instance : askedFor(session, kSettingClass, view)) {
-    Origin origin{interfaceOfSetting(instance)};
-    const bool isServiceProcessor = propertyText(instance, "InstanceID").starts_with("BMC%");
-    if (configurations) origin.node = configurations->find(origin.interface, isServiceProcessor);
-    addSettings(view.interfaceSettings, kInterfaceSettings, instance, tree == nullptr ? nullptr : &origin,
-                origin.interface);
+void placeSettings(InterfaceRow& row, std::vector<SettingRow> settings) {
+  row.settings = std::move(settings);
+  if (const SettingRow* servers = settingNamed(row.settings, "DNSServerAddresses")) row.servers = servers->values;
+  if (const SettingRow* domain = settingNamed(row.settings, "DomainName")) {
+    row.domainName = domain->values.empty() ? std::string() : domain->values.front();
   }
-  Origin general{interfaceOfHostSettings(session).value_or("")};
-  std::stable_sort(view.interfaceSettings.begin(), view.interfaceSettings.end(),
-                   [](const SettingRow& a, const SettingRow& b) { return a.interface < b.interface; });
-  if (configurations) general.node = configurations->find(general.interface, false);
+}
+
+/// What only the tree says.
+void placeFacts(InterfaceRow& row, const LocalFacts& local) {
+  const zorva::agent::Node* node = local.find(row.name, row.isServiceProcessor);
+  if (local.hasFile(row.name)) row.source = SettingSource::File;
+  if (node == nullptr) return;
+  row.facts = ownerFacts(*node);
+  if (row.source == SettingSource::File) {
+    row.hostServers = listOf(*node, ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES);
+    return;
+  }
+  const auto& properties = node->properties();
+  const bool isSet = std::any_of(properties.begin(), properties.end(), [](const auto& each) { return each.overlaid; });
+  const bool hasValue = row.hasDns() || !row.domainName.empty();
+  row.source = isSet ? SettingSource::Set : hasValue ? SettingSource::Host : SettingSource::None;
+}
+
+void readInterfaces(Session& session, HostView& view, const LocalFacts* local) {
+  for (const broker::Instance& instance : askedFor(session, kEndpointClass, view)) {
+    view.interfaces.push_back(rowOfEndpoint(instance));
+  }
+  RowsByName rows(view.interfaces);
+  for (const broker::Instance& instance : askedFor(session, kSettingClass, view)) {
+    const std::string name = interfaceOfSetting(instance);
+    const bool isServiceProcessor = propertyText(instance, "InstanceID").starts_with("BMC%");
+    placeSettings(rows.take(name, isServiceProcessor),
+                  settingsOf(kInterfaceSettings, instance, name, local, isServiceProcessor));
+  }
+  if (local != nullptr) {
+    for (InterfaceRow& row : view.interfaces) placeFacts(row, *local);
+  }
+  std::stable_sort(view.interfaces.begin(), view.interfaces.end(),
+                   [](const InterfaceRow& a, const InterfaceRow& b) { return a.name < b.name; });
+}
+
+/// What the node of the host's system says.
+void readSystemNode(const zorva::agent::TreeSnapshot& tree, HostRow& host) {
+  using namespace zorva::agent;
+  for (const Node* node = tree.nextOfType(NodeType::System, 0); node != nullptr;
+       node = tree.nextOfType(NodeType::System, node->index() + 1)) {
+    if (node->isServiceProcessor()) continue;
+    host.facts = ownerFacts(*node);
+    host.servers = listOf(*node, ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES);
+    host.ownSuffixes = listOf(*node, ZV::NodeLexicon::PROP_DNS_SUFFIXES);
+    host.resolverServers = listOf(*node, kResolverServers);
+    host.resolverNotAsked = listOf(*node, kResolverNotAsked);
+    host.resolverSearch = listOf(*node, kResolverSearch);
+    host.resolverOptions = listOf(*node, kResolverOptions);
+    return;
+  }
+}
+
+void readHost(Session& session, HostView& view, const LocalFacts* local) {
+  HostRow& host = view.host;
+  host.interface = interfaceOfHostSettings(session).value_or("");
+  if (local != nullptr) {
+    host.hasFile = local->hasFile(host.interface);
+    readSystemNode(local->tree(), host);
+  }
   for (const broker::Instance& instance : askedFor(session, kGeneralSettingClass, view)) {
-    addSettings(view.hostSettings, kHostSettings, instance, tree == nullptr ? nullptr : &general, general.interface);
+    host.settings = settingsOf(kHostSettings, instance, host.interface, local, false);
+    host.suffixes = textsOf(instance, "DNSSuffixesToAppend");
   }
 }
 
@@ -214,26 +343,65 @@ bool HostView::couldAsk(std::string_view className) const {
   });
 }
 
-HostView readHostView(Session& session, Progress& progress, bool countsAll) {
+bool InterfaceRow::hasDns() const {
+  return !servers.empty() || !suffixes.empty() || !facts.routingDomains.empty() || source == SettingSource::File ||
+         source == SettingSource::Set;
+}
+
+std::string InterfaceRow::from() const {
+  if (source == SettingSource::File) return "ifcfg-" + name;
+  if (source == SettingSource::Set) return "overlay.json";
+  if (source == SettingSource::None && facts.owner.empty()) return {};
+  if (facts.owner.empty()) return sourceName(SettingSource::Host);
+  if (facts.profile.empty()) return facts.owner;
+  // A file is named without its folder, a profile as what it is.
+  const std::size_t slash = facts.profile.rfind('/');
+  const bool isPath = facts.profile.starts_with('/');
+  return facts.owner + ", " + (isPath ? facts.profile.substr(slash + 1) : "profile " + facts.profile);
+}
+
+std::string placeOfHostSettings(const std::string& interface, bool hasFile) {
+  if (interface.empty()) return {};
+  const std::string file = "ifcfg-" + interface;
+  constexpr const char* kWhy = "the settings of the host are in the file of the first interface";
+  if (hasFile) return "kept in " + file + ": " + kWhy;
+  return std::string("from the host; ") + file + ", which does not exist, would replace them: " + kWhy;
+}
+
+std::string HostRow::place() const { return placeOfHostSettings(interface, hasFile); }
+
+HostView readHostView(Session& session, Progress& progress) {
   const Session::Quiet quiet(session);
   HostView view;
   view.hasSources = !session.isRemote();
-  progress.step("reading the endpoints");
+  std::optional<LocalFacts> local;
+  if (!session.isRemote()) local.emplace(session);
+  const LocalFacts* facts = local ? &*local : nullptr;
+  progress.step("reading the interfaces");
   view.systemName = systemNameOf(session, view);
-  for (const broker::Instance& instance : askedFor(session, kEndpointClass, view)) {
-    view.endpoints.push_back(endpointRow(instance));
-  }
-  std::stable_sort(view.endpoints.begin(), view.endpoints.end(),
-                   [](const EndpointRow& a, const EndpointRow& b) { return a.name < b.name; });
-  progress.step("reading the servers");
-  readServers(session, view);
-  progress.step("reading the settings");
-  readSettings(session, view);
-  view.classes = readClassRows(session, progress, countsAll);
-  for (const ClassRow& row : view.classes) {
-    if (!row.problem.empty()) addProblem(view.problems, row.name, row.problem);
-  }
+  readInterfaces(session, view, facts);
+  progress.step("reading the settings of the host");
+  readHost(session, view, facts);
   return view;
+}
+
+void keepOnly(HostView& view, const std::vector<std::string>& names) {
+  const std::unordered_set<std::string> wanted(names.begin(), names.end());
+  std::unordered_set<std::string> found;
+  std::vector<std::string> known;
+  std::vector<InterfaceRow> kept;
+  for (InterfaceRow& row : view.interfaces) {
+    if (known.size() < kListedNames) known.push_back(printable(row.name));
+    if (!wanted.contains(row.name)) continue;
+    found.insert(row.name);
+    kept.push_back(std::move(row));
+  }
+  for (const std::string& name : names) {
+    if (found.contains(name)) continue;
+    throw Failure(ExitCode::Failed, "this host has no interface " + printable(name),
+                  known.empty() ? "it has none at all" : "it has " + joined(known, ", "));
+  }
+  view.interfaces = std::move(kept);
 }
 
 }  // namespace zorva::cli

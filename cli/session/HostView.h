@@ -1,14 +1,16 @@
 #pragma once
 
-// The first view for a person: the DNS client configuration of the host, read from the providers.
+// The first view for a person: the DNS client configuration of the host, read from the providers, and from the tree
+// what CIM does not say.
 
 #include <cstdint>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "cli/output/Progress.h"
-#include "cli/session/ClassRows.h"
+#include "cli/session/Problems.h"
 #include "cli/session/Session.h"
 #include "frontend/SettingsClaims.h"
 
@@ -17,7 +19,6 @@ namespace zorva::cli {
 using frontend::kEndpointClass;
 using frontend::kGeneralSettingClass;
 using frontend::kSettingClass;
-inline constexpr const char* kServerClass = "ZORVA_RemoteServiceAccessPoint";
 inline constexpr const char* kSystemClass = "ZORVA_ComputerSystem";
 
 /// The source of a setting's value: the interface's file, the host, a value that was set and replaces the host's own,
@@ -25,21 +26,6 @@ inline constexpr const char* kSystemClass = "ZORVA_ComputerSystem";
 enum class SettingSource { File, Host, Set, None };
 
 const char* sourceName(SettingSource source) noexcept;
-
-struct EndpointRow {
-  std::string name;
-  std::string system;
-  std::optional<std::uint64_t> stateNumber;
-  std::string state;  ///< "Enabled"
-  std::string hostName;
-  std::string domainName;
-  std::vector<std::string> suffixes;
-};
-
-struct ServerRow {
-  std::uint64_t order = 0;
-  std::string address;
-};
 
 struct SettingRow {
   std::string interface;  ///< the interface whose file and host settings count
@@ -49,22 +35,78 @@ struct SettingRow {
   SettingSource source = SettingSource::None;
 };
 
+/// What an owner of DNS settings says beside the lists; empty where it does not say. The values are the tree's.
+struct OwnerFacts {
+  std::string owner;
+  std::string profile;
+  std::string origin;
+  std::vector<std::string> serversInFull;
+  std::vector<std::string> routingDomains;
+  std::string defaultRoute;
+  std::string dnsOverTls;
+  std::string dnssec;
+  std::string llmnr;
+  std::string multicastDns;
+};
+
+struct InterfaceRow {
+  std::string name;
+  std::string system;
+  bool isServiceProcessor = false;
+  std::optional<std::uint64_t> stateNumber;
+  std::string state;  ///< "Enabled"
+  std::string hostName;
+  std::string endpointDomain;  ///< of the endpoint, which does not read the interface's file
+  std::vector<std::string> servers;
+  std::string domainName;
+  std::vector<std::string> suffixes;
+  std::vector<SettingRow> settings;
+
+  SettingSource source = SettingSource::None;  ///< File or Set if that holds for any of the values
+  OwnerFacts facts;
+  std::vector<std::string> hostServers;  ///< those of the host where a file replaces them
+
+  /// Whether it has servers or domains of its own, or something was set for it. The domain alone does not count: it may
+  /// be the host's.
+  bool hasDns() const;
+
+  /// "NetworkManager, profile lan", "ifcfg-eth0", "/etc/resolv.conf"; empty if nothing supplies values.
+  std::string from() const;
+};
+
+/// What belongs to the host and to no interface. Without a tree only the suffixes are known.
+struct HostRow {
+  std::string interface;              ///< whose file has the settings of the host; empty: none, or not known
+  bool hasFile = false;               ///< it exists
+  std::vector<SettingRow> settings;   ///< of ZORVA_DNSGeneralSettingData
+  std::vector<std::string> suffixes;  ///< among them
+  OwnerFacts facts;
+  std::vector<std::string> servers;  ///< for which the owner asks on behalf of the host
+  std::vector<std::string> ownSuffixes;
+  std::vector<std::string> resolverServers;
+  std::vector<std::string> resolverNotAsked;
+  std::vector<std::string> resolverSearch;
+  std::vector<std::string> resolverOptions;
+
+  /// Which file holds the settings, and why; empty where that is not known.
+  std::string place() const;
+};
+
 struct HostView {
   std::string systemName;
-  std::vector<EndpointRow> endpoints;  ///< in the order of their names
-  std::vector<ServerRow> servers;      ///< in search order
-  std::vector<SettingRow> interfaceSettings;
-  std::vector<SettingRow> hostSettings;
-  std::vector<ClassRow> classes;
-  bool hasSources = true;         ///< false: the settings' sources are not known, for example with a server
+  std::vector<InterfaceRow> interfaces;  ///< in the order of their names
+  HostRow host;
+  bool hasSources = true;         ///< false: owners and the settings' sources are not known, for example with a server
   std::vector<Problem> problems;  ///< the failed queries; their parts of the view are empty
 
   bool couldAsk(std::string_view className) const;
 };
 
-/// Queries the providers. A part that cannot be read is left empty and reported in `problems`. Endpoints and settings
-/// are in the order of their names.
-HostView readHostView(Session& session, Progress& progress, bool countsAll);
+/// Queries the providers, each class once. A part that cannot be read is left empty and reported in `problems`.
+HostView readHostView(Session& session, Progress& progress);
+
+/// Leaves only the interfaces of these names. Throws Failure if there is none of such a name.
+void keepOnly(HostView& view, const std::vector<std::string>& names);
 
 /// The instances of a class. Throws Failure if they cannot be read.
 std::vector<broker::Instance> instancesOf(Session& session, std::string_view className);
@@ -75,5 +117,8 @@ std::string interfaceOfSetting(const broker::Instance& setting);
 /// The interface whose file has the settings of the host as a whole: that of the first configuration outside a service
 /// processor. Nothing if there is none, and with a server, which does not say.
 std::optional<std::string> interfaceOfHostSettings(const Session& session);
+
+/// "kept in ifcfg-eth0: ...": in words which file holds the settings of the host, or would.
+std::string placeOfHostSettings(const std::string& interface, bool hasFile);
 
 }  // namespace zorva::cli

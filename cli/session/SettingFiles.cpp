@@ -1,0 +1,78 @@
+#include "cli/session/SettingFiles.h"
+
+#include <dirent.h>
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <memory>
+#include <string_view>
+#include <unordered_set>
+
+#include "agent/Agent.h"
+#include "cli/output/Console.h"
+#include "cli/output/Text.h"
+
+namespace zorva::cli {
+
+namespace {
+
+constexpr std::string_view kPrefix = "ifcfg-";
+
+bool exists(const std::string& path) {
+  struct stat status {};
+  return ::stat(path.c_str(), &status) == 0;
+}
+
+}  // namespace
+
+bool SettingFiles::has(const std::string& interface) const {
+  return std::binary_search(interfaces.begin(), interfaces.end(), interface);
+}
+
+SettingFiles findSettingFiles() {
+  SettingFiles files;
+  const std::string directory = zorva::agent::dataDirectory();
+  const std::unique_ptr<DIR, int (*)(DIR*)> open(::opendir(directory.c_str()), ::closedir);
+  if (open == nullptr) {
+    files.error = errno == ENOENT ? 0 : errno;
+    return files;
+  }
+  while (const dirent* entry = ::readdir(open.get())) {
+    const std::string_view name = entry->d_name;
+    if (name.size() == kPrefix.size() || !name.starts_with(kPrefix)) continue;
+    if (exists(directory + entry->d_name)) files.interfaces.emplace_back(name.substr(kPrefix.size()));
+  }
+  std::sort(files.interfaces.begin(), files.interfaces.end());
+  return files;
+}
+
+std::vector<std::string> orphansAmong(const SettingFiles& files, const zorva::agent::TreeSnapshot& tree) {
+  std::unordered_set<std::string_view> names;
+  for (const zorva::agent::Node& node : tree.nodes()) {
+    const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
+    if (name != nullptr) names.insert(*name);
+  }
+  std::vector<std::string> orphans;
+  for (const std::string& interface : files.interfaces) {
+    if (!names.contains(interface)) orphans.push_back(interface);
+  }
+  return orphans;
+}
+
+void warnOfOrphans(const Session& session) {
+  constexpr std::size_t kShownNames = 5;
+  if (session.isRemote()) return;
+  const std::vector<std::string> orphans = orphansAmong(findSettingFiles(), *session.tree());
+  if (orphans.empty()) return;
+  std::vector<std::string> names;
+  for (std::size_t i = 0; i < std::min(orphans.size(), kShownNames); ++i) {
+    names.push_back("ifcfg-" + printable(orphans[i]));
+  }
+  const std::string more =
+      orphans.size() > names.size() ? " and " + std::to_string(orphans.size() - names.size()) + " more" : "";
+  tellWarning("nothing reads " + joined(names, ", ") + more + ": this host has no such interface" +
+              (orphans.size() > 1 ? "s" : "") + "; zorvactl ifcfg list, adopt and remove deal with that");
+}
+
+}  // namespace zorva::cli
