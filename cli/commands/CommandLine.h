@@ -33,8 +33,8 @@ struct Telling {
 /// The possible words at a place of the command line.
 struct Completion {
   std::vector<std::string> words;  ///< subcommands, options, or the values of an option
-  /// Other possible words: "CLASS", "PATH", "INTERFACE", "METHOD", "PROPERTY", "ROLE", and with a "=" after them
-  /// "PROPERTY=" and "PARAMETER="; there is no list of others.
+  /// Other possible words: "CLASS", "PATH", "INTERFACE", "OLD" (an interface that is gone), "METHOD", "PROPERTY",
+  /// "ROLE", and with a "=" after them "PROPERTY=" and "PARAMETER="; there is no list of others.
   std::string kind;
 };
 

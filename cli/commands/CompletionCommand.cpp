@@ -5,6 +5,7 @@
 #include "cli/commands/Commands.h"
 #include "cli/output/Console.h"
 #include "cli/session/Session.h"
+#include "cli/session/SettingFiles.h"
 
 namespace zorva::cli {
 
@@ -89,6 +90,13 @@ void addInterfaces(const Globals& globals, std::vector<std::string>& words) {
   }
 }
 
+/// Those that are gone and have a file.
+void addOrphans(const Globals& globals, std::vector<std::string>& words) {
+  const Session session(globals);
+  const std::vector<std::string> orphans = orphansAmong(findSettingFiles(), *session.tree());
+  words.insert(words.end(), orphans.begin(), orphans.end());
+}
+
 bool begins(const std::string& word, const std::string& begun) {
   return word.size() >= begun.size() && util::sameName(std::string_view(word).substr(0, begun.size()), begun);
 }
@@ -101,6 +109,8 @@ Completion completionOf(const CommandLine& line, const Globals& globals, const s
       return word == "--url" || word.starts_with("--url=");
     });
     if (isHere) addInterfaces(globals, completion.words);
+  } else if (completion.kind == "OLD") {
+    addOrphans(globals, completion.words);
   } else if (!completion.kind.empty()) {
     Session session(globals);
     if (completion.kind == "CLASS" || completion.kind == "PATH") {

@@ -36,9 +36,20 @@ TEST_F(Changing, SuffixCommandsChangeTheSuffixesOfTheHost) {
   EXPECT_EQ(file(), wholeFileWith("DNSSUFFIXES=example.org example.net ", "DNSSUFFIXES=a.example b.example "));
   done(host_, {"suffixes", "add", "c.example"});
   done(host_, {"suffixes", "remove", "a.example"});
-  EXPECT_EQ(done(host_, {"suffixes", "show"}), "b.example\nc.example\n");
+  const Outcome now = host_.run({"suffixes", "show"});
+  EXPECT_EQ(now.out, "b.example\nc.example\n");
+  EXPECT_EQ(
+      now.err,
+      "zorvactl: note: the suffixes are kept in ifcfg-eth0: the settings of the host are in the file of the first "
+      "interface\n");
   EXPECT_EQ(done(host_, {"suffixes", "set"}),
-            "ZORVA_DNSGeneralSettingData.InstanceID=\"dnsgen1:host1\"\n  DNSSuffixesToAppend\n");
+            "ZORVA_DNSGeneralSettingData.InstanceID=\"dnsgen1:host1\"\n  DNSSuffixesToAppend\n"
+            "The suffixes are kept in ifcfg-eth0: the settings of the host are in the file of the first interface.\n");
+}
+
+TEST(Suffixes, SayWhichFileWouldHoldThem) {
+  EXPECT_THAT(TestHost().run({"suffixes", "show"}).err,
+              HasSubstr("the suffixes are from the host; ifcfg-eth0, which does not exist, would replace them: "));
 }
 
 TEST(Suffixes, SayThatAHostWithoutInterfacesHasNone) {

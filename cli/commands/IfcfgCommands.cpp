@@ -1,4 +1,4 @@
-// ifcfg init, ifcfg show.
+// ifcfg init, ifcfg show, ifcfg list, ifcfg remove, ifcfg adopt.
 
 #include <sys/stat.h>
 #include <unistd.h>
@@ -17,6 +17,7 @@
 #include "cli/output/Text.h"
 #include "cli/session/Session.h"
 #include "cli/session/SettingFile.h"
+#include "cli/session/SettingFiles.h"
 
 namespace zorva::cli {
 
@@ -79,6 +80,146 @@ void showInterfaceFile(const Globals& globals, const std::string& interface) {
   write(printable(file.path()) + "\n" + settingTable(lines, session.layout()));
 }
 
+/// Keys in the order of the file, each once. A file that cannot be read has a problem in their place.
+ListedFile listed(const std::string& interface, bool isOrphan) {
+  ListedFile file;
+  const SettingFile there(interface);
+  file.path = there.path();
+  file.interface = interface;
+  file.isOrphan = isOrphan;
+  try {
+    for (const SettingLine& line : there.read()) {
+      if (std::find(file.keys.begin(), file.keys.end(), line.key) == file.keys.end()) file.keys.push_back(line.key);
+    }
+  } catch (const Failure& failure) {
+    file.problem = failure.what();
+  }
+  return file;
+}
+
+std::vector<ListedFile> listedFiles(const Session& session) {
+  const SettingFiles files = findSettingFiles();
+  if (files.error != 0) {
+    throw Failure(ExitCode::Failed,
+                  printable(zorva::agent::dataDirectory()) + ": cannot be read: " + std::strerror(files.error));
+  }
+  const std::vector<std::string> orphans = orphansAmong(files, *session.tree());
+  std::vector<ListedFile> rows;
+  for (const std::string& interface : files.interfaces) {
+    rows.push_back(listed(interface, std::binary_search(orphans.begin(), orphans.end(), interface)));
+  }
+  return rows;
+}
+
+void listInterfaceFiles(const Globals& globals) {
+  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "ifcfg list");
+  requireLocal(globals, "ifcfg list");
+  const Session session(globals);
+  const std::vector<ListedFile> files = listedFiles(session);
+  if (globals.output == OutputFormat::Json) {
+    write(listedFilesJson(files) + "\n");
+    return;
+  }
+  if (files.empty()) {
+    tellNote("there is no file of settings in " + printable(zorva::agent::dataDirectory()) +
+             "; zorvactl ifcfg init makes one");
+    return;
+  }
+  Table table({"FILE", "INTERFACE", "KEYS"});
+  for (const ListedFile& file : files) {
+    table.add({"ifcfg-" + file.interface, file.isOrphan ? Cell("gone: an orphan", Style::Bad) : Cell(file.interface),
+               file.problem.empty() ? Cell::list(file.keys) : Cell(file.problem, Style::Bad)});
+  }
+  write(table.text(session.layout()));
+}
+
+struct RemoveOptions {
+  std::string interface;
+  bool dryRun = false;
+};
+
+void removeInterfaceFile(const Globals& globals, const RemoveOptions& options) {
+  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "ifcfg remove");
+  requireLocal(globals, "ifcfg remove");
+  Session session(globals);
+  const SettingFile file(options.interface);
+  const std::vector<SettingLine> lines = file.read();
+  if (!options.dryRun) {
+    const Session::Changing alone(session);
+    file.remove();
+  }
+  if (globals.output == OutputFormat::Json) {
+    write(settingFileJson(file.path(), lines) + "\n");
+    return;
+  }
+  write((options.dryRun ? "would remove " : "removed ") + printable(file.path()) + "\n" +
+        settingTable(lines, session.layout()));
+}
+
+struct AdoptOptions {
+  std::string from;
+  std::string to;
+  bool dryRun = false;
+};
+
+/// The file of an interface that is there is in use; taking it away would change that interface's settings.
+void requireOrphan(const zorva::agent::TreeSnapshot& tree, const std::string& interface) {
+  const std::vector<std::string> orphans = orphansAmong({{interface}, 0}, tree);
+  if (!orphans.empty()) return;
+  throw Failure(ExitCode::Failed,
+                "this host has an interface " + printable(interface) + ", whose settings the file has",
+                "zorvactl ifcfg list shows which files are orphans");
+}
+
+void adoptInterfaceFile(const Globals& globals, const AdoptOptions& options) {
+  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "ifcfg adopt");
+  requireLocal(globals, "ifcfg adopt");
+  Session session(globals);
+  const Session::Changing alone(session, options.dryRun);
+  const auto tree = session.tree();
+  const SettingFile from(options.from);
+  const SettingFile to(options.to);
+  const std::vector<SettingLine> lines = from.read();
+  requireOrphan(*tree, options.from);
+  interfaceNode(*tree, options.to);
+  if (to.exists()) {
+    throw Failure(ExitCode::Failed, printable(to.path()) + ": exists already, and is left as it is",
+                  "zorvactl ifcfg remove " + printable(options.to) + " removes it");
+  }
+  if (!options.dryRun) from.moveTo(to);
+  if (globals.output == OutputFormat::Json) {
+    write(settingFileJson(to.path(), lines) + "\n");
+    return;
+  }
+  write((options.dryRun ? "would make " : "made ") + printable(from.path()) + " " + printable(to.path()) + "\n" +
+        settingTable(lines, session.layout()));
+}
+
+/// About the files of all interfaces, also of those that are gone.
+void addFileCommands(Subcommand& ifcfg) {
+  ifcfg.add("list", "List the files that there are, and mark those whose interfaces are gone")
+      .writes({OutputFormat::Table, OutputFormat::Json})
+      .examples("  zorvactl ifcfg list")
+      .runs(listInterfaceFiles);
+
+  const auto removed = std::make_shared<RemoveOptions>();
+  ifcfg.add("remove", "Remove it; the interface then has what the host says")
+      .writes({OutputFormat::Table, OutputFormat::Json})
+      .examples("  zorvactl ifcfg remove eth0 --dry-run\n  zorvactl ifcfg remove eth0")
+      .word("INTERFACE", "The interface's name", removed->interface)
+      .flag("--dry-run", "Show what would be done, and do nothing", removed->dryRun)
+      .runs<RemoveOptions>(removeInterfaceFile, removed);
+
+  const auto adopted = std::make_shared<AdoptOptions>();
+  ifcfg.add("adopt", "Give the file of an interface that is gone to another one")
+      .writes({OutputFormat::Table, OutputFormat::Json})
+      .examples("  zorvactl ifcfg adopt eth0 enp1s0             eth0 is called enp1s0 now")
+      .word("OLD", "The name of the interface that is gone", adopted->from)
+      .word("INTERFACE", "The interface that gets its file", adopted->to)
+      .flag("--dry-run", "Show what would be done, and do nothing", adopted->dryRun)
+      .runs<AdoptOptions>(adoptInterfaceFile, adopted);
+}
+
 }  // namespace
 
 void addIfcfgCommands(CommandLine& line) {
@@ -103,6 +244,7 @@ void addIfcfgCommands(CommandLine& line) {
       .examples("  zorvactl ifcfg show eth0")
       .word("INTERFACE", "The interface's name", *interface)
       .runs<std::string>(showInterfaceFile, interface);
+  addFileCommands(ifcfg);
 }
 
 }  // namespace zorva::cli

@@ -9,6 +9,7 @@
 #include "cli/output/ValueText.h"
 #include "cli/session/Change.h"
 #include "cli/session/HostView.h"
+#include "cli/session/SettingFiles.h"
 
 namespace zorva::cli {
 
@@ -73,14 +74,24 @@ broker::Instance settingOf(Session& session, const ListSetting& setting, const S
   return setting.isOfInterface ? settingOfInterface(session, options.interface) : settingOfHost(session);
 }
 
+/// In words, which file the settings of the host are in, and why.
+std::string placeOf(const Session& session, const ListSetting& setting) {
+  if (setting.isOfInterface || session.isRemote()) return {};
+  const std::string interface = interfaceOfHostSettings(session).value_or("");
+  return placeOfHostSettings(interface, findSettingFiles().has(interface));
+}
+
 /// Replaces the list by the result of `changed`. No other program can change it in the meantime.
 template <typename Changed>
 void changeList(const ListSetting& setting, const Globals& globals, const SettingOptions& options, Changed changed) {
   Session session(globals);
   const Session::Changing alone(session, options.dryRun);
+  warnOfOrphans(session);
   const broker::Instance instance = settingOf(session, setting, options);
   changeSetting(session, globals, options, instance, setting.property,
                 broker::Value::textArray(changed(listOf(instance, setting.property))));
+  const std::string place = globals.output == OutputFormat::Json ? std::string() : placeOf(session, setting);
+  if (!place.empty()) write("The suffixes are " + printable(place) + ".\n");
 }
 
 }  // namespace
@@ -88,12 +99,17 @@ void changeList(const ListSetting& setting, const Globals& globals, const Settin
 void showList(const ListSetting& setting, const Globals& globals, const SettingOptions& options) {
   requireReadable(setting, "show", globals);
   Session session(globals);
+  warnOfOrphans(session);
   const std::vector<std::string> texts = listOf(settingOf(session, setting, options), setting.property);
   if (globals.output == OutputFormat::Json) {
     write(textsJson(texts) + "\n");
-    return;
+  } else {
+    for (const std::string& text : texts) write(printable(text) + "\n");
   }
-  for (const std::string& text : texts) write(printable(text) + "\n");
+  // Not among the suffixes, which are for scripts, too.
+  if (const std::string place = placeOf(session, setting); !place.empty()) {
+    tellNote("the suffixes are " + printable(place));
+  }
 }
 
 void setList(const ListSetting& setting, const Globals& globals, const SettingOptions& options) {

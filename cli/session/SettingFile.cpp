@@ -21,6 +21,7 @@ namespace zorva::cli {
 
 namespace {
 
+constexpr const char* kListHint = "zorvactl ifcfg list shows the files that there are";
 constexpr std::size_t kLargestFile = std::size_t{16} << 20U;
 
 [[noreturn]] void fail(const std::string& path, const std::string& what, const std::string& hint = {}) {
@@ -134,8 +135,29 @@ void SettingFile::write(const std::vector<SettingLine>& lines, bool replaces) co
     fail(path_, error == EEXIST ? "exists already" : std::string("cannot be written: ") + std::strerror(error),
          error == EEXIST ? "--force puts a new file in its place" : "");
   }
-  util::syncDirectory(path_.substr(0, path_.rfind('/') + 1));
+  syncFolder();
 }
+
+bool SettingFile::exists() const {
+  struct stat status {};
+  return ::lstat(path_.c_str(), &status) == 0;
+}
+
+void SettingFile::remove() const {
+  if (::unlink(path_.c_str()) != 0) fail(path_, std::string("cannot be removed: ") + std::strerror(errno), kListHint);
+  syncFolder();
+}
+
+void SettingFile::moveTo(const SettingFile& other) const {
+  if (::renameat2(AT_FDCWD, path_.c_str(), AT_FDCWD, other.path_.c_str(), RENAME_NOREPLACE) != 0) {
+    const int error = errno;
+    if (error == EEXIST) fail(other.path_, "exists already, and is left as it is", "zorvactl ifcfg show shows it");
+    fail(path_, std::string("cannot become ") + printable(other.path_) + ": " + std::strerror(error), kListHint);
+  }
+  syncFolder();
+}
+
+void SettingFile::syncFolder() const { util::syncDirectory(path_.substr(0, path_.rfind('/') + 1)); }
 
 std::vector<SettingLine> settingsOfHost(const zorva::agent::Node& interface) {
   using namespace ZV::NodeLexicon;

@@ -37,8 +37,18 @@ class SettingFile {
   /// or, without `replaces`, if the file exists already.
   void write(const std::vector<SettingLine>& lines, bool replaces) const;
 
+  /// Whether there is anything of that name.
+  bool exists() const;
+
+  /// Throws Failure if there is no such file, or it cannot be removed.
+  void remove() const;
+
+  /// Makes it the file of another interface. Throws Failure if that one has a file, or it cannot be done.
+  void moveTo(const SettingFile& other) const;
+
  private:
   std::string contents() const;
+  void syncFolder() const;
 
   std::string path_;
 };
