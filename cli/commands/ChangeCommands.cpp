@@ -121,12 +121,13 @@ void invokeMethod(const Globals& globals, const InvokeOptions& options) {
   const broker::Status status = session.cim().invokeMethod(path, method.name, input, result);
   if (!status.ok()) throw operationFailure(method.name + " of " + shortPathText(path), status, parametersOf(method));
   write(globals.output == OutputFormat::Json ? methodResultJson(result) + "\n" : methodTable(result, session.layout()));
-  if (path.className == kEndpointClass) {
-    tellNote(method.name +
-             " checks and answers, and changes nothing; 'zorvactl dns', 'domain', 'suffixes' and 'modify' do");
-  }
   if (const std::string value = valueText(result.returnValue, nullptr); value != "0" && !result.returnValue.isNull) {
     throw Failure(ExitCode::Failed, method.name + " returned " + value);
+  }
+  // A method that sets something was asked to store it.
+  if (path.className == kEndpointClass && method.name.starts_with("Set")) {
+    throw Failure(ExitCode::Failed, "nothing was stored: " + method.name + " checks and answers, and changes nothing",
+                  "'zorvactl dns', 'domain', 'suffixes' and 'modify' change settings");
   }
 }
 

@@ -2,6 +2,7 @@
 
 #include <filesystem>
 
+#include "cli/output/Text.h"
 #include "cli/testing/Running.h"
 
 namespace zorva::cli {
@@ -175,7 +176,7 @@ TEST_F(Changing, AValueThatBeginsWithAHyphenFollowsTwoOfThem) {
   done(host_, {"domain", "eth0", "--", "-x.example.org"});
   EXPECT_EQ(file(), wholeFileWith("DOMAINNAME=example.org", "DOMAINNAME=-x.example.org"));
   done(host_, {"suffixes", "set", "--", "--help", "-o"});
-  EXPECT_EQ(done(host_, {"suffixes", "show"}), "--help\n-o\n");
+  EXPECT_EQ(shown(host_, {"suffixes", "show"}), "--help\n-o\n");
   expectFailed(host_, {"domain", "eth0", "-x.example.org"}, 2, "a value that begins with '-' goes after --; ");
 }
 
@@ -189,11 +190,73 @@ TEST(Invoke, AnswersAndSaysThatNothingChanges) {
     Words all{"invoke", kEndpoint};
     all.insert(all.end(), words.begin(), words.end());
     const Outcome outcome = host.run(all);
-    EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
+    EXPECT_EQ(outcome.exitCode, 1) << "what was asked for was not stored";
     EXPECT_EQ(outcome.out, "ReturnValue  0\n");
-    EXPECT_THAT(outcome.err, HasSubstr("changes nothing"));
+    EXPECT_THAT(outcome.err, AllOf(HasSubstr("nothing was stored: SetDNS"), HasSubstr("changes nothing")));
   }
   EXPECT_EQ(done(host, {"ei", "CIM_ManagedElement", "-o", "json"}), before);
+}
+
+/// Each asks for something that is not stored.
+const std::vector<Words> kUnstored{
+    {"dns", "set", "eth1", "192.0.2.9"},
+    {"dns", "add", "eth1", "192.0.2.9"},
+    {"dns", "remove", "eth1", "192.0.2.53"},
+    {"domain", "eth1", "x.example.org"},
+    {"domain", "eth0", "x.example.org"},
+    {"suffixes", "set", "x.example.org"},
+    {"modify", R"(ZORVA_DNSSettingData.InstanceID="Computer%eth1")", "DomainName=x.example.org"},
+    {"modify", kGeneral, "DNSSuffixesToAppend=x.example.org"},
+    {"modify", kEndpoint, "DomainName=null"},
+    {"invoke", kEndpoint, "SetDNSDomain", "DNSDomain=x.example.org"},
+    {"overlay", "clear", "eth0"},
+    {"ifcfg", "init", "eth0"},
+    {"ifcfg", "remove", "eth1"},
+    {"ifcfg", "adopt", "eth0", "eth1"},
+    {"dns", "set", "eth7", "192.0.2.9"},
+};
+
+TEST(Unstored, IsAnErrorInEveryFormatAndUnderQuiet) {
+  for (const Words& words : kUnstored) {
+    const TestHost host;
+    host.directory().write("data/ifcfg-eth0", "HOSTNAME=host1\n");
+    const auto outcomeWith = [&](const Words& options) {
+      Words all = options;
+      all.insert(all.end(), words.begin(), words.end());
+      return host.run(all);
+    };
+    const Outcome table = outcomeWith({});
+    EXPECT_EQ(table.exitCode, 1) << joined(words, " ");
+    EXPECT_THAT(table.err, StartsWith("zorvactl: ")) << joined(words, " ");
+    const Outcome asJson = outcomeWith({"--output", "json"});
+    EXPECT_EQ(asJson.exitCode, 1) << joined(words, " ");
+    EXPECT_EQ(asJson.err, table.err);
+    const Outcome quiet = outcomeWith({"--quiet"});
+    EXPECT_EQ(quiet.exitCode, 1) << joined(words, " ");
+    EXPECT_EQ(quiet.err, table.err);
+    EXPECT_EQ(quiet.out, "");
+    EXPECT_EQ(contentsOf(host.dataFile("ifcfg-eth0")), "HOSTNAME=host1\n") << joined(words, " ");
+  }
+}
+
+TEST_F(Changing, QuietWritesNothingOnSuccess) {
+  host_.directory().write("data/ifcfg-gone0", "");
+  for (const Words& words : std::vector<Words>{{"dns", "set", "eth0", "192.0.2.9"},
+                                               {"domain", "eth0", "x.example.org"},
+                                               {"suffixes", "add", "x.example.org"},
+                                               {"suffixes", "show"},
+                                               {"modify", kSetting, "DomainName=y.example.org"},
+                                               {"ifcfg", "remove", "gone0"},
+                                               {"show"},
+                                               {"classes"},
+                                               {"graph"}}) {
+    Words all = words;
+    all.emplace_back("-q");
+    const Outcome outcome = host_.run(all, OutputTo::ErrorTerminal);
+    EXPECT_EQ(outcome.exitCode, 0) << joined(words, " ");
+    EXPECT_EQ(outcome.out + outcome.err, "") << joined(words, " ");
+  }
+  EXPECT_THAT(file(), AllOf(HasSubstr("DNSSERVERS=192.0.2.9 \n"), HasSubstr("DOMAINNAME=y.example.org\n")));
 }
 
 TEST(Invoke, NamesTheMethodsAndParametersThereAre) {

@@ -7,6 +7,7 @@
 #include <charconv>
 #include <map>
 
+#include "cli/output/Console.h"
 #include "cli/output/Text.h"
 
 namespace zorva::cli {
@@ -15,7 +16,8 @@ namespace {
 
 constexpr const char* kExamples = R"(
 Examples:
-  zorvactl show                                          all at a glance
+  zorvactl show                                          all at a glance; show eth0: all of one
+  zorvactl check                                         do the servers answer?
   zorvactl ei ZORVA_DNSProtocolEndPoint --output json    the DNS client of each interface
   zorvactl get 'ZORVA_DNSProtocolEndPoint.Name="eth0"'   one of them
   zorvactl ai 'ZORVA_DNSProtocolEndPoint.Name="eth0"' --result-class CIM_RemoteServiceAccessPoint
@@ -105,6 +107,9 @@ void addGlobalOptions(CLI::App& app, Globals& globals) {
   };
   app.add_option("-o,--output", output, "How to write the results: table, json, mof, xml; graph: dot, svg")
       ->type_name("FORMAT");
+  app.add_flag_callback(
+      "-q,--quiet", [&globals] { globals.quiet = true; },
+      "Write errors only; the exit status says whether it succeeded");
   CLI::Option* config = addText(app, "--config",
                                 "The agent's configuration (default: $ZORVAGENT_CONFIG, else "
                                 "/etc/zorvagent/agent.toml)",
@@ -186,7 +191,8 @@ std::string CommandLine::Registered::footerOf(const CLI::App& subcommand) const 
   const std::vector<std::string> names = namesOf(formatsOf(subcommand));
   if (names.size() > 1) text += "\nIt writes " + joined(names, ", ") + " (--output).";
   return text +
-         "\nThe options of zorvactl itself may be given here as well: --url, --config, --log-level, --provider-dir.";
+         "\nThe options of zorvactl itself may be given here as well: --url, --config, --log-level, --provider-dir, "
+         "--quiet.";
 }
 
 void CommandLine::Registered::placeFooters(CLI::App& above) const {
@@ -311,7 +317,10 @@ Subcommand CommandLine::add(const std::string& name, const std::string& descript
 
 const Globals& CommandLine::globals() const noexcept { return registered_->globals; }
 
-void CommandLine::run() const { registered_->command(registered_->globals); }
+void CommandLine::run() const {
+  if (registered_->globals.quiet) writeOnlyErrors();
+  registered_->command(registered_->globals);
+}
 
 std::optional<Telling> CommandLine::read(int argc, const char* const* argv) {
   CLI::App& app = registered_->app;

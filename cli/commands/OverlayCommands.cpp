@@ -41,7 +41,7 @@ void showOverlay(const Globals& globals) {
 }
 
 void clearOverlay(const Globals& globals, const std::string& name) {
-  requireFormat(globals.output, {OutputFormat::Table}, "overlay clear");
+  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "overlay clear");
   requireLocal(globals, "overlay clear");
   const Session session(globals);
   const auto interface = name.empty() ? std::nullopt : std::optional(name);
@@ -50,7 +50,8 @@ void clearOverlay(const Globals& globals, const std::string& name) {
     throw Failure(ExitCode::Failed, "no value is set for " + printable(*interface),
                   "zorvactl overlay show lists those that are");
   }
-  write(counted(cleared, "value") + " taken back\n");
+  write(globals.output == OutputFormat::Json ? countJson("cleared", cleared) + "\n"
+                                             : counted(cleared, "value") + " taken back\n");
 }
 
 }  // namespace
@@ -67,6 +68,7 @@ void addOverlayCommands(CommandLine& line) {
 
   const auto interface = std::make_shared<std::string>();
   overlay.add("clear", "Take them back")
+      .writes({OutputFormat::Table, OutputFormat::Json})
       .examples(
           "  zorvactl overlay clear eth0\n"
           "  zorvactl overlay clear                        of all interfaces")

@@ -10,10 +10,23 @@
 
 namespace zorva::cli {
 
+namespace {
+
+bool isQuiet = false;
+
+}  // namespace
+
+void writeOnlyErrors() {
+  isQuiet = true;
+  Progress::neverShow();
+}
+
 void tell(const char* kind, std::string_view what) {
+  const std::string_view word(kind);
+  if (isQuiet && (word == "warning: " || word == "note: ")) return;
   std::fflush(stdout);
   Progress::makeRoom();
-  const std::string line = std::string("zorvactl: ") + kind + std::string(what) + "\n";
+  const std::string line = std::string("zorvactl: ").append(word).append(what) + "\n";
   std::fwrite(line.data(), 1, line.size(), stderr);
 }
 
@@ -27,6 +40,7 @@ void tellWarning(std::string_view what) { tell("warning: ", what); }
 void tellNote(std::string_view what) { tell("note: ", what); }
 
 void write(std::string_view text) {
+  if (isQuiet) return;
   if (std::fwrite(text.data(), 1, text.size(), stdout) != text.size()) flushOutput();
 }
 

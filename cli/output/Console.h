@@ -6,6 +6,9 @@
 
 namespace zorva::cli {
 
+/// From now on only errors are written: neither results nor warnings nor notes.
+void writeOnlyErrors();
+
 /// A line on stderr: the name of the program, the kind of the line ("warning: ") and `what`.
 void tell(const char* kind, std::string_view what);
 

@@ -15,6 +15,7 @@ constexpr std::size_t kUsualWidth = 80;
 
 std::mutex currentMutex;
 Progress* current = nullptr;
+bool isNever = false;
 
 void writeToTerminal(const std::string& text) { (void)!::write(STDERR_FILENO, text.data(), text.size()); }
 
@@ -25,8 +26,10 @@ std::size_t widthOfTerminal() {
 
 }  // namespace
 
+void Progress::neverShow() { isNever = true; }
+
 Progress::Progress() {
-  if (::isatty(STDERR_FILENO) == 0) return;
+  if (isNever || ::isatty(STDERR_FILENO) == 0) return;
   {
     const std::lock_guard lock(currentMutex);
     current = this;

@@ -23,6 +23,9 @@ class Progress {
   /// Erases the line, if one is shown, until the next step, so that something else can be written.
   static void makeRoom();
 
+  /// From now on no line is shown.
+  static void neverShow();
+
  private:
   void run();
   void show();

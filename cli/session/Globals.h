@@ -13,6 +13,7 @@ struct Globals {
   std::string config;             ///< the agent's configuration; empty: as the environment says
   std::optional<int> logLevel;    ///< lines below it are dropped; absent: as the configuration says
   std::string providerDirectory;  ///< empty: beside this program
+  bool quiet = false;             ///< write errors only
   std::string url;                ///< of the CIM server to ask; empty: the providers, in this process
 };
 
