@@ -15,6 +15,8 @@
 #include "cli/output/Failure.h"
 #include "cli/output/ResultWriter.h"
 #include "cli/output/Text.h"
+#include "cli/session/Change.h"
+#include "cli/session/HostView.h"
 #include "cli/session/Session.h"
 #include "cli/session/SettingFile.h"
 #include "cli/session/SettingFiles.h"
@@ -147,6 +149,10 @@ void removeInterfaceFile(const Globals& globals, const RemoveOptions& options) {
   if (!options.dryRun) {
     const Session::Changing alone(session);
     file.remove();
+    if (zorva::agent::currentConfig().appliesToHost) {
+      tellNote("what was applied to the host stays; zorvactl revert " + printable(options.interface) +
+               " takes it back");
+    }
   }
   if (globals.output == OutputFormat::Json) {
     write(settingFileJson(file.path(), lines) + "\n");
@@ -186,7 +192,13 @@ void adoptInterfaceFile(const Globals& globals, const AdoptOptions& options) {
     throw Failure(ExitCode::Failed, printable(to.path()) + ": exists already, and is left as it is",
                   "zorvactl ifcfg remove " + printable(options.to) + " removes it");
   }
-  if (!options.dryRun) from.moveTo(to);
+  if (!options.dryRun) {
+    from.moveTo(to);
+    broker::ObjectPath changed;
+    changed.className = kSettingClass;
+    changed.keys.push_back({"InstanceID", broker::Value::text("Computer%" + options.to)});
+    bringToHost(changed);
+  }
   if (globals.output == OutputFormat::Json) {
     write(settingFileJson(to.path(), lines) + "\n");
     return;

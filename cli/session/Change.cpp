@@ -77,14 +77,14 @@ void requireModified(const broker::ObjectPath& path, const broker::Status& statu
                              : "");
 }
 
-/// A server that is asked does this itself. The lock is held: commands that change hold it as a whole.
+}  // namespace
+
 void bringToHost(const broker::ObjectPath& path) {
   const frontend::HostEffect effect = frontend::applyToHost(path, frontend::SettingsLockIs::Held);
-  if (!effect.status.ok()) throw Failure(ExitCode::Failed, printable(effect.status.message), "zorvactl apply tries again");
+  if (!effect.status.ok())
+    throw Failure(ExitCode::Failed, printable(effect.status.message), "zorvactl apply tries again");
   if (!effect.done.empty()) tellNote(printable(effect.done));
 }
-
-}  // namespace
 
 broker::Instance changeInstance(Session& session, const broker::ObjectPath& path,
                                 const std::vector<broker::Property>& changes, const ChangeOptions& options) {
@@ -107,6 +107,7 @@ broker::Instance changeInstance(Session& session, const broker::ObjectPath& path
   // Local changes have been checked already, under the same lock.
   requireModified(found.path,
                   session.isRemote() ? frontend::checkChanges(now, changes, reasonThere) : checkFiles(now, changes));
+  // A server that is asked does this itself.
   if (!session.isRemote()) bringToHost(found.path);
   return now;
 }

@@ -23,6 +23,10 @@ struct ChangeOptions {
 broker::Instance changeInstance(Session& session, const broker::ObjectPath& path,
                                 const std::vector<broker::Property>& changes, const ChangeOptions& options);
 
+/// Brings the settings of a changed instance to the host, where the configuration says so. The lock is held. Throws
+/// Failure if the host does not have them then.
+void bringToHost(const broker::ObjectPath& path);
+
 /// Prints on standard output what was changed, or would be.
 void writeChanges(const Session& session, const broker::Instance& instance,
                   const std::vector<broker::Property>& changes, const ChangeOptions& options);
