@@ -7,6 +7,14 @@ prefix=$(mktemp -d)
 trap 'rm -rf "$prefix"' EXIT
 cmake --install "$1" --prefix "$prefix" >/dev/null
 
+# What is commented in the configuration can be used as it stands, and the file is not replaced by the next installation.
+grep -q '^apply = "host"' "$prefix/etc/zorvagent/agent.toml"
+sed -E 's/^# ([a-z_]+ = )/\1/' "$prefix/etc/zorvagent/agent.toml" >"$prefix/all.toml"
+"$prefix/bin/zorvactl" --config "$prefix/all.toml" tree >/dev/null
+echo '# mine' >"$prefix/etc/zorvagent/agent.toml"
+cmake --install "$1" --prefix "$prefix" >/dev/null
+grep -q '^# mine' "$prefix/etc/zorvagent/agent.toml"
+
 printf '[agent]\ndata_dir = "data/"\n[log]\ntarget = "off"\n' >"$prefix/agent.toml"
 export ZORVAGENT_CONFIG="$prefix/agent.toml"
 "$prefix/bin/zorvactl" enumerate ZORVA_ComputerSystem --output json >"$prefix/systems.json"

@@ -25,7 +25,7 @@ struct ApplyResult {
   std::string profile;                  ///< the owner's profile or file
   std::vector<PropertyChange> changes;  ///< made, or on a dry run to be made; empty: the host has the settings already
   std::string problem;  ///< why it was not applied, one line with the owner and the next step; else empty
-  std::string note;     ///< e.g. that it is gone when systemd-resolved restarts
+  std::string note;     ///< e.g. that it is gone when the host restarts
 };
 
 struct ApplyOptions {

@@ -51,7 +51,7 @@ class DnsWriter {
   /// Brings back what save() found, or what is learned (DHCP) where nothing was set by hand. Safe to repeat.
   virtual Expected<void, Refusal> restore(const DnsTarget& target, const std::string& saved) = 0;
 
-  /// What a person should know after a change that worked ("gone when systemd-resolved restarts"); empty for nothing.
+  /// What a person should know after a change that worked ("it is gone when the host restarts"); empty for nothing.
   virtual std::string note() const { return {}; }
 };
 
