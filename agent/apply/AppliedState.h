@@ -38,15 +38,16 @@ struct AppliedMemory {
   const SavedDns* find(const std::string& interface, const std::string& owner, const std::string& profile) const;
 };
 
-struct AppliedState {
-  struct Trial {
-    std::uint64_t until = 0;      ///< seconds since 1970
-    std::vector<SavedDns> saved;  ///< before the trial
-    AppliedMemory before;         ///< the memory before the trial
-  };
+/// Changes that are taken back unless somebody confirms them.
+struct AppliedTrial {
+  std::uint64_t until = 0;      ///< seconds since 1970
+  std::vector<SavedDns> saved;  ///< before the trial
+  AppliedMemory before;         ///< the memory before the trial
+};
 
+struct AppliedState {
   AppliedMemory memory;
-  std::optional<Trial> trial;
+  std::optional<AppliedTrial> trial;
   /// By interface: the wanted settings, as textOf() has them, that were taken back. They are not applied automatically.
   std::map<std::string, std::string> heldBack;
 };

@@ -3,7 +3,7 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <memory>
+#include <optional>
 #include <stdexcept>
 #include <utility>
 
@@ -20,18 +20,28 @@ namespace {
 using namespace ZV::NodeLexicon;
 using std::chrono::system_clock;
 
-constexpr const char* kLockName = "lock";
 constexpr const char* kNetworkdOwner = "systemd-networkd";
 
-std::unique_ptr<FileLock> lockOf(const std::string& dataDir) {
-  constexpr std::chrono::seconds kLongest{30};
+util::FileDescriptor openLock(const std::string& path) {
   constexpr mode_t kRights = 0600;
-  const std::string path = appliedDirectory(dataDir) + kLockName;
   util::FileDescriptor file = openLockFile(path, kRights);
   if (!file) util::throwFileError(path, "cannot be opened");
-  return std::make_unique<FileLock>(std::move(file), path, FileLock::Mode::Exclusive,
-                                    std::chrono::steady_clock::now() + kLongest);
+  return file;
 }
+
+// One process at a time applies.
+class ApplyLock {
+ public:
+  explicit ApplyLock(const std::string& dataDir)
+      : path_(appliedDirectory(dataDir) + "lock"),
+        lock_(openLock(path_), path_, FileLock::Mode::Exclusive, std::chrono::steady_clock::now() + kLongest) {}
+
+ private:
+  static constexpr std::chrono::seconds kLongest{30};
+
+  std::string path_;
+  FileLock lock_;
+};
 
 StringList listOfText(const std::string& text) { return text.empty() ? StringList() : StringList{text}; }
 
@@ -75,7 +85,8 @@ Applier::Applier(const std::string& dataDir, HostDns::Look look, OverlayValues o
     : dataDir_(dataDir), file_(dataDir), overlay_(std::move(overlay)), host_(std::move(look)) {}
 
 std::vector<ApplyResult> Applier::apply(const std::vector<std::string>& names, const ApplyOptions& options) {
-  const auto lock = options.dryRun ? nullptr : lockOf(dataDir_);
+  std::optional<ApplyLock> lock;
+  if (!options.dryRun) lock.emplace(dataDir_);
   host_.look();
   readState(!options.dryRun);
   std::vector<Plan> plans;
@@ -292,7 +303,8 @@ std::string Applier::notTaken(const Plan& plan) {
 }
 
 std::vector<ApplyResult> Applier::revert(const std::vector<std::string>& names, const ApplyOptions& options) {
-  const auto lock = options.dryRun ? nullptr : lockOf(dataDir_);
+  std::optional<ApplyLock> lock;
+  if (!options.dryRun) lock.emplace(dataDir_);
   host_.look();
   readState(!options.dryRun);
   StringList meant = names;
@@ -407,7 +419,7 @@ void Applier::readState(bool mayChange) {
 
 void Applier::beginTrial(std::vector<SavedDns> saved, std::chrono::seconds length) {
   if (saved.empty()) return;
-  state_.trial = AppliedState::Trial{secondsOf(system_clock::now() + length), std::move(saved), state_.memory};
+  state_.trial = AppliedTrial{secondsOf(system_clock::now() + length), std::move(saved), state_.memory};
   file_.write(state_);
 }
 
@@ -431,7 +443,7 @@ std::vector<ApplyResult> Applier::takeBackTrial() {
 }
 
 std::vector<ApplyResult> Applier::endTrial() {
-  const auto lock = lockOf(dataDir_);
+  const ApplyLock lock(dataDir_);
   state_ = file_.read();
   if (!state_.trial.has_value()) return {};
   host_.look();
@@ -445,7 +457,7 @@ std::optional<system_clock::time_point> pendingTrialIn(const std::string& dataDi
 }
 
 void confirmTrialIn(const std::string& dataDir) {
-  const auto lock = lockOf(dataDir);
+  const ApplyLock lock(dataDir);
   const AppliedStateFile file(dataDir);
   AppliedState state = file.read();
   if (!state.trial.has_value()) return;

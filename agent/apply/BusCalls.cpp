@@ -107,7 +107,7 @@ Expected<void, std::string> BusCalls::open(Deadline deadline) {
 Expected<void, std::string> BusCalls::call(const SystemBus::Method& method, const Fill& fill,
                                            const std::function<void(BusReader&)>& read) {
   const Deadline deadline = steady_clock::now() + longestCall_;
-  if (const auto opened = open(deadline); !opened) return opened;
+  if (auto opened = open(deadline); !opened) return opened;
   sd_bus_message* made = nullptr;
   int result = ::sd_bus_message_new_method_call(bus_, &made, method.destination.c_str(), method.path.c_str(),
                                                 method.interface.c_str(), method.member.c_str());

@@ -5,6 +5,7 @@
 #include <array>
 #include <cerrno>
 #include <filesystem>
+#include <optional>
 #include <system_error>
 #include <utility>
 

@@ -6,6 +6,7 @@
 #include <array>
 #include <cerrno>
 #include <filesystem>
+#include <optional>
 #include <system_error>
 #include <utility>
 

@@ -98,7 +98,7 @@ TEST(ResolvConfChange, IsRefusedWhereTwoInterfacesHaveDifferentLists) {
     host.apply({"tun1"});
     EXPECT_EQ(host.shown("eth0"), "192.0.2.9 /old.example ");
     host.apply({"eth0"});
-    host.revert({"tun1"});
+    host.revert({"eth0"});
     EXPECT_EQ(contentsOf(kFile), kBefore) << "the file is one for both";
     host.want("tun1", "DNSSERVERS=192.0.2.1\n");
     EXPECT_EQ(host.apply().find("PROBLEM"), std::string::npos) << "they agree";

@@ -102,7 +102,8 @@ std::string settleList(std::optional<StringList>& list, PropertyNumber property,
   for (std::string value : *list) {
     std::string problem = name + ": '";
     util::appendEscaped(problem, value);
-    if (const std::string reason = settle(value, interface); !reason.empty()) return problem + "' " + reason;
+    if (const std::string reason = settle(value, interface); !reason.empty())
+      return problem.append("' ").append(reason);
     const auto isSame = [&](const std::string& other) { return sameName(other, value); };
     if (std::none_of(settled.begin(), settled.end(), isSame)) settled.push_back(value);
   }
