@@ -83,8 +83,9 @@ TEST(Readme, ItsCommandsThatChangeWorkInTheirOrder) {
   EXPECT_THAT(contentsOf(host.dataFile("ifcfg-eth0")), HasSubstr("DOMAINNAME=lab.example.org\n"));
 }
 
-TEST(Readme, SaysOnItsFirstScreenWhatAChangeDoesNotReach) {
-  EXPECT_LT(readme().find("It does not reach the host's resolver yet"), readme().find("\n## "));
+TEST(Readme, SaysOnItsFirstScreenWhenAChangeReachesTheHost) {
+  EXPECT_LT(readme().find("`zorvactl apply`"), readme().find("\n## "));
+  EXPECT_LT(readme().find("`[tree] apply = \"host\"`"), readme().find("\n## "));
 }
 
 }  // namespace
