@@ -3,12 +3,107 @@
 // The steps that the eight association providers share. Each provider's source contains its own walks, made of these.
 
 #include <string>
+#include <type_traits>
 #include <vector>
 
 #include "factory/DNSClientObjFactory.h"
 #include "providers/Operation.h"
+#include "providers/Results.h"
 
 namespace ZV {
+
+/// The errors of the four operations if a source has no far end.
+struct NoFarEnd {
+  const char* associators;
+  const char* associatorNames;
+  const char* references;
+  const char* referenceNames;
+};
+constexpr NoFarEnd kNamesEachOperation = {
+    "Object Path is NULL in Associators.", "Object Path is NULL in AssociatorNames.",
+    "Object Path is NULL in References.", "Object Path is NULL in ReferenceNames."};
+constexpr NoFarEnd kNamesTwoOperations = {"Object Path is NULL in Associators.", "Object Path is NULL in Associators.",
+                                          "Object Path is NULL in References.", "Object Path is NULL in References."};
+
+using MakePath = CMPIObjectPath* (*)(const CMPIBroker*, const std::string& nameSpace, const char* className,
+                                     CMPIStatus*);
+
+/// The class that a provider serves.
+struct Association {
+  const std::string category;  ///< of the provider's log lines
+  const char* className;
+  const char* firstName;  ///< of its references
+  const char* secondName;
+  MakePath makePath;       ///< of references: with this host, or without
+  const char* namedClass;  ///< of the paths that ReferenceNames returns
+  const NoFarEnd& noFarEnd;
+};
+
+// --- Instances or their paths. Associators and References return the first, AssociatorNames and ReferenceNames the
+// second. One walk serves both: it is a template on Found, which is CMPIInstance or CMPIObjectPath.
+
+template <typename Found>
+constexpr bool kReturnsInstances = std::is_same_v<Found, CMPIInstance>;
+
+template <typename Found, typename Value>
+constexpr Value either(Value forInstances, Value forPaths) {
+  return kReturnsInstances<Found> ? forInstances : forPaths;
+}
+
+/// A property of an instance, or the key of that name.
+inline std::string textIn(Operation& operation, const CMPIInstance* instance, const char* name) {
+  return propertyText(instance, name, &operation.status);
+}
+inline std::string textIn(Operation& operation, const CMPIObjectPath* path, const char* name) {
+  return keyText(path, name, &operation.status);
+}
+
+/// The path of an instance, or the path itself.
+inline CMPIObjectPath* pathOf(Operation& operation, const CMPIInstance* instance) {
+  return objectPathOf(instance, &operation.status);
+}
+inline CMPIObjectPath* pathOf(Operation&, CMPIObjectPath* path) { return path; }
+
+template <typename Found>
+Found* next(Operation& operation, const CMPIEnumeration* objects) {
+  if constexpr (kReturnsInstances<Found>) {
+    return nextInstance(objects, &operation.status);
+  } else {
+    return nextPath(objects, &operation.status);
+  }
+}
+
+/// The namespace of the source, for returnOnThisHost; not read if instances are returned.
+template <typename Found>
+std::string nameSpaceForPaths(Operation& operation) {
+  return kReturnsInstances<Found> ? std::string() : nameSpaceOf(operation.ref, &operation.status);
+}
+
+/// Returns an instance unchanged, or a path with that namespace and this host.
+void returnOnThisHost(const Operation& operation, const CMPIInstance* instance, const std::string& nameSpace);
+void returnOnThisHost(const Operation& operation, CMPIObjectPath* path, const std::string& nameSpace);
+
+/// Returns a reference: as the instance, or as its path with the namespace of the source.
+template <typename Found>
+void deliver(Operation& operation, const CMPIInstance* reference, const std::string& nameSpace) {
+  if constexpr (!kReturnsInstances<Found>) {
+    CMPIObjectPath* path = objectPathOf(reference, &operation.status);
+    setNameSpace(path, nameSpace);
+    returnOne(operation, path);
+  } else {
+    returnOne(operation, reference);
+  }
+}
+
+/// The same with this host in the path.
+template <typename Found>
+void deliverOnThisHost(Operation& operation, const CMPIInstance* reference, const std::string& nameSpace) {
+  if constexpr (!kReturnsInstances<Found>) {
+    returnOnThisHost(operation, objectPathOf(reference, &operation.status), nameSpace);
+  } else {
+    returnOne(operation, reference);
+  }
+}
 
 // --- The far end.
 
@@ -17,7 +112,7 @@ bool isMissing(const Operation& operation, const CMPIObjectPath* path, const cha
                const Place& place = Place::here());
 
 struct FarEnd {
-  CMPIObjectPath* path = nullptr;  ///< of the far end's class, without keys; null or bad if there is none
+  CMPIObjectPath* path = nullptr;  ///< of the far end's class, without keys
   std::string className;
 };
 
@@ -26,9 +121,17 @@ inline const char* associationOr(const char* assocClass, const char* ownClass) {
   return assocClass != nullptr ? assocClass : ownClass;
 }
 
-/// The far end of associators. If there is none, the text is written as an error.
-FarEnd resolveFarEnd(Operation& operation, DNSClientObjFactory& factory, const char* associationClass,
-                     const char* resultClass, const char* noFarEnd, const Place& place = Place::here());
+/// Whether a request that names resultClass accepts objects of this far end. It does if the request names no class, the
+/// class itself, or the CIM class that it implements, in any case; not for a base class.
+bool passesResultClass(const char* resultClass, const char* ownName, const char* cimName);
+
+/// A provider's walk for Associators and AssociatorNames.
+using Associate = CMPIStatus (*)(Operation& operation, DNSClientObjFactory& factory, const FarEnd& farEnd);
+
+/// Looks up the far end and takes the walk. If there is no far end, the text is written, and the operation is left
+/// open.
+CMPIStatus associateWith(Associate walk, Operation operation, const Association& association, const char* noFarEnd,
+                         const Place& place = Place::here());
 
 /// The data from which the references of a source are made.
 struct ReferenceParts {
@@ -37,31 +140,32 @@ struct ReferenceParts {
   CMPIObjectPath* association = nullptr;  ///< the path for each reference
 };
 
-using MakePath = CMPIObjectPath* (*)(const CMPIBroker*, const std::string& nameSpace, const char* className,
-                                     CMPIStatus*);
+/// A provider's walk for References and ReferenceNames.
+using Refer = CMPIStatus (*)(Operation& operation, DNSClientObjFactory& factory, const ReferenceParts& parts);
 
-/// Looks up the far end in ownClass and makes a path of madeClass. If there is no far end, the text is written, but
-/// only after the path is made.
-ReferenceParts resolveReferences(Operation& operation, DNSClientObjFactory& factory, const char* ownClass,
-                                 MakePath makePath, const char* madeClass, const char* noFarEnd,
-                                 const Place& place = Place::here());
-
-/// Whether a request that names resultClass accepts objects of this far end. It does if the request names no class, the
-/// class itself, or the CIM class that it implements, in any case; not for a base class.
-bool passesResultClass(const char* resultClass, const char* ownName, const char* cimName);
+/// The same for the references, with a path of madeClass. It is made before a missing far end is reported.
+CMPIStatus referWith(Refer walk, Operation operation, const Association& association, const char* madeClass,
+                     const char* noFarEnd, const Place& place = Place::here());
 
 // --- Objects at the ends.
 
 /// Ask the broker for another provider's objects. False, with an error, if the status has a failing code. The second
-/// and the third ask with a new path of the class, and write noPath if it cannot be made.
-bool askForNames(Operation& operation, const CMPIObjectPath* classPath, const CMPIEnumeration*& names,
-                 const Place& place = Place::here());
-bool askForNames(Operation& operation, const std::string& nameSpace, const char* className, const char* noPath,
-                 const CMPIEnumeration*& names, const Place& place = Place::here());
-bool askForInstances(Operation& operation, const std::string& nameSpace, const char* className, const char* noPath,
-                     const CMPIEnumeration*& instances, const Place& place = Place::here());
-bool askForInstances(Operation& operation, const CMPIObjectPath* classPath, const char* failed,
-                     const CMPIEnumeration*& instances, const Place& place = Place::here());
+/// asks with a new path of the class, and writes noPath if it cannot be made.
+template <typename Found>
+bool askFor(Operation& operation, const CMPIObjectPath* classPath, const CMPIEnumeration*& objects,
+            const char* failed = "CBEnumInstanceNames Failed for the target Class",
+            const Place& place = Place::here()) {
+  const auto enumerate = kReturnsInstances<Found> ? enumerateInstances : enumerateInstanceNames;
+  objects = enumerate(operation.broker, operation.context, classPath, &operation.status);
+  return operation.status.rc == CMPI_RC_OK || complain(operation, failed, place);
+}
+template <typename Found>
+bool askForAll(Operation& operation, const std::string& nameSpace, const char* className, const char* noPath,
+               const CMPIEnumeration*& objects, const Place& place = Place::here()) {
+  const CMPIObjectPath* classPath = newPath(operation.broker, nameSpace, className, &operation.status);
+  if (isMissing(operation, classPath, noPath, place)) return false;
+  return askFor<Found>(operation, classPath, objects, "CBEnumInstanceNames Failed for the target Class", place);
+}
 
 /// A key of the source.
 std::string sourceKey(Operation& operation, const char* name);
@@ -69,35 +173,27 @@ std::string sourceKey(Operation& operation, const char* name);
 // --- Pairs.
 
 /// Sets both references of an instance.
-void setPair(const CMPIInstance* instance, const char* firstName, const CMPIObjectPath* first, const char* secondName,
+void setPair(const CMPIInstance* instance, const Association& association, const CMPIObjectPath* first,
              const CMPIObjectPath* second);
 
-/// A new instance of an association with its two references; the broker's result, good or not.
-CMPIInstance* newPair(Operation& operation, const CMPIObjectPath* association, const char* firstName,
-                      const CMPIObjectPath* first, const char* secondName, const CMPIObjectPath* second);
+/// A new instance with that path and both references; the broker's result, good or not.
+CMPIInstance* newPair(Operation& operation, const Association& association, const CMPIObjectPath* path,
+                      const CMPIObjectPath* first, const CMPIObjectPath* second);
 
-/// A new instance on this host for a builder; the broker's result, good or not. False, with the text as an error, if
-/// its path cannot be made.
-bool newBuilt(Operation& operation, const std::string& nameSpace, const char* className, const char* noPath,
+/// A new instance on this host for a builder; the broker's result, good or not. A good one has the filter of the
+/// properties that the client asks for. False, with the text as an error, if its path cannot be made.
+bool newBuilt(Operation& operation, const Association& association, const std::string& nameSpace, const char* noPath,
               CMPIInstance*& instance, const Place& place = Place::here());
 
-/// Returns an association's path with its two references as keys.
-void returnPairPath(const Operation& operation, CMPIObjectPath* path, const char* firstName,
-                    const CMPIObjectPath* first, const char* secondName, const CMPIObjectPath* second);
+/// Returns a path on this host with both references as keys. False, with the text as an error, if it cannot be made.
+bool returnPair(Operation& operation, const Association& association, const std::string& nameSpace, const char* noPath,
+                const CMPIObjectPath* first, const CMPIObjectPath* second, const Place& place = Place::here());
 
-// --- Results.
-
-/// How a walk over references returns each one: as the instance, or as its path with the namespace of the source.
-using Deliver = void (*)(Operation& operation, const CMPIInstance* reference, const std::string& nameSpace);
-
-void deliverInstance(Operation& operation, const CMPIInstance* reference, const std::string& nameSpace);
-void deliverPath(Operation& operation, const CMPIInstance* reference, const std::string& nameSpace);
-void deliverPathOnThisHost(Operation& operation, const CMPIInstance* reference, const std::string& nameSpace);
+// --- What is built.
 
 /// Gathers all instances of a provider's class. In the log it is an operation of its own. It has its own status, so
 /// that its failures do not reach the client. Returns 0, or 1 if it failed.
-using Builder = unsigned short (*)(const CMPIContext* context, const CMPIObjectPath* ref, const char** properties,
-                                   std::vector<CMPIInstance*>& instances);
+using Builder = unsigned short (*)(Operation operation, std::vector<CMPIInstance*>& instances);
 
 /// An error that ends a builder; always 1, its result. The second also logs the exit: five builders do so if the
 /// settings cannot be fetched.
@@ -105,11 +201,11 @@ unsigned short failBuilder(const Operation& operation, const char* text, const P
 unsigned short failAndLeaveBuilder(const Operation& operation, const char* text, const Place& place = Place::here());
 
 /// Returns all built instances, or nothing if the builder fails.
-void returnBuilt(const Operation& operation, Builder build, const char** properties);
+void returnBuilt(const Operation& operation, Builder build);
 void returnPathsOfBuilt(Operation& operation, Builder build);
 
 /// Returns the first built instance whose path equals that of the request.
-void returnEqualBuilt(Operation& operation, Builder build, const char** properties, const Place& place = Place::here());
+void returnEqualBuilt(Operation& operation, Builder build, const Place& place = Place::here());
 
 /// The end of the association operations of three providers: the exit is logged, returnDone is not called.
 CMPIStatus endWithoutDone(const Operation& operation, const Place& place = Place::here());
@@ -118,3 +214,40 @@ CMPIStatus endWithoutDone(const Operation& operation, const Place& place = Place
 void Tokenize(const std::string& text, std::vector<std::string>& tokens, const std::string& delimiters);
 
 }  // namespace ZV
+
+/// EnumInstances and GetInstance of a provider, from its builder.
+#define ZV_BUILT_INSTANCES(stem, association, build)            \
+  static CMPIStatus stem##_EnumInstances(Operation operation) { \
+    operation = enter(operation, association.category);         \
+    returnBuilt(operation, build);                              \
+    return end(operation);                                      \
+  }                                                             \
+  static CMPIStatus stem##_GetInstance(Operation operation) {   \
+    operation = enter(operation, association.category);         \
+    returnEqualBuilt(operation, build);                         \
+    return end(operation);                                      \
+  }
+
+/// The association operations of a provider, by its walks associate<Found> and refer<Found>, and its tables and create
+/// functions.
+#define ZV_ASSOCIATION_PROVIDER(prefix, stem, association)                                                            \
+  namespace ZV {                                                                                                      \
+  static CMPIStatus stem##_Associators(Operation operation) {                                                         \
+    return associateWith(associate<CMPIInstance>, enter(operation, association.category), association,                \
+                         association.noFarEnd.associators);                                                           \
+  }                                                                                                                   \
+  static CMPIStatus stem##_AssociatorNames(Operation operation) {                                                     \
+    return associateWith(associate<CMPIObjectPath>, enter(operation, association.category), association,              \
+                         association.noFarEnd.associatorNames);                                                       \
+  }                                                                                                                   \
+  static CMPIStatus stem##_References(Operation operation) {                                                          \
+    return referWith(refer<CMPIInstance>, enter(operation, association.category), association, association.className, \
+                     association.noFarEnd.references);                                                                \
+  }                                                                                                                   \
+  static CMPIStatus stem##_ReferenceNames(Operation operation) {                                                      \
+    return referWith(refer<CMPIObjectPath>, enter(operation, association.category), association,                      \
+                     association.namedClass, association.noFarEnd.referenceNames);                                    \
+  }                                                                                                                   \
+  }                                                                                                                   \
+  ZV_INSTANCE_MI(prefix, stem, refusedModification)                                                                   \
+  ZV_ASSOCIATION_MI(prefix, stem)

@@ -74,8 +74,7 @@ TEST(IsMissing, LogsPathsThatAreNullOrWithoutHandleInTheOperationsNameAtTheCalle
   RecordingLogger logger;
   RecordingBroker broker;
   const std::string category = "Zorvagent.SomeProvider";
-  const Operation operation = {broker.cmpi(), category, "SomeProvider_References", nullptr, nullptr,
-                               nullptr,       kStatusOk};
+  const Operation operation = named({.broker = broker.cmpi()}, category, "SomeProvider_References");
   CMPIObjectPath* path = broker.make(Path("ZORVA_X"));
   EXPECT_FALSE(isMissing(operation, path, "gone"));
   EXPECT_EQ(0U, logger.size());
@@ -101,12 +100,13 @@ TEST(IsMissing, LogsPathsThatAreNullOrWithoutHandleInTheOperationsNameAtTheCalle
 class NewPair : public ::testing::Test {
  protected:
   CMPIInstance* make(const CMPIObjectPath* path, const CMPIObjectPath* first, const CMPIObjectPath* second) {
-    return newPair(operation, path, "Left", first, "Right", second);
+    return newPair(operation, pairs, path, first, second);
   }
 
   RecordingBroker broker;
   const std::string category = "Zorvagent.SomeProvider";
-  Operation operation{broker.cmpi(), category, "SomeProvider_References", nullptr, nullptr, nullptr, kStatusOk};
+  const Association pairs = {category, "ZORVA_X", "Left", "Right", newPath, "ZORVA_X", kNamesTwoOperations};
+  Operation operation = named({.broker = broker.cmpi()}, category, "SomeProvider_References");
   CMPIObjectPath* association = broker.make(Path("ZORVA_X"), "association");
   CMPIObjectPath* left = broker.make(Path("ZORVA_L"), "left");
   CMPIObjectPath* right = broker.make(Path("ZORVA_R"), "right");

@@ -17,64 +17,56 @@ static const char* const setDNSSuffixSearchOrderMethod = "SetDNSSuffixSearchOrde
 
 // A failure leaves the result open: no returnDone and no exit in the log. The status is what the broker's calls left.
 
-static CMPIStatus DNSClient_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
-                                              const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(loggerDNSClientProv, context, result, ref);
+static CMPIStatus DNSClient_EnumInstanceNames(Operation operation) {
+  operation = enter(operation, loggerDNSClientProv);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> paths;
-  if (!fetchEndpoints(operation, factory, ref, paths)) return fail(operation, "getAllDNSClientCMPIObjPaths Failed");
-  for (const CMPIObjectPath* path : paths) returnObjectPath(result, path);
+  if (!fetchEndpoints(operation, factory, operation.ref, paths))
+    return fail(operation, "getAllDNSClientCMPIObjPaths Failed");
+  for (const CMPIObjectPath* path : paths) returnOne(operation, path);
   return end(operation);
 }
 
-static CMPIStatus DNSClient_EnumInstances(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
-                                          const CMPIObjectPath* ref, const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSClientProv, context, result, ref);
+static CMPIStatus DNSClient_EnumInstances(Operation operation) {
+  operation = enter(operation, loggerDNSClientProv);
   DNSClientObjFactory factory;
   std::vector<CMPIInstance*> instances;
-  if (!fetchEndpoints(operation, factory, ref, properties, instances)) {
+  if (!fetchEndpoints(operation, factory, operation.ref, instances)) {
     return fail(operation, "getAllDNSClientCMPIInstances Failed");
   }
-  for (const CMPIInstance* instance : instances) returnInstance(result, instance);
+  for (const CMPIInstance* instance : instances) returnOne(operation, instance);
   return end(operation);
 }
 
-static CMPIStatus DNSClient_GetInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
-                                        const CMPIObjectPath* ref, const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSClientProv, context, result, ref);
-  if (keyCountOf(ref, &operation.status) == 0) {
+static CMPIStatus DNSClient_GetInstance(Operation operation) {
+  operation = enter(operation, loggerDNSClientProv);
+  if (keyCountOf(operation.ref, &operation.status) == 0) {
     complain(operation, "At least one key should be passed");
     return end(operation);
   }
-  const CMPIString* name = stringOf(getKey(ref, "Name", &operation.status));
+  const CMPIString* name = stringOf(getKey(operation.ref, "Name", &operation.status));
   DNSClientObjFactory factory;
   std::vector<CMPIInstance*> instances;
   if (isGood(name)) {  // only the name decides; the other keys are ignored
-    if (factory.getOneDNSClientCMPIInstance(broker, ref, const_cast<CMPIString*>(name), properties, instances,
-                                            &operation.status) != 0) {
+    if (factory.getOneDNSClientCMPIInstance(broker, operation.ref, const_cast<CMPIString*>(name), operation.properties,
+                                            instances, &operation.status) != 0) {
       return fail(operation, "getOneDNSClientCMPIInstance Failed");
     }
-    for (const CMPIInstance* instance : instances) returnInstance(result, instance);
+    for (const CMPIInstance* instance : instances) returnOne(operation, instance);
   } else {  // all keys count
-    if (!fetchEndpoints(operation, factory, ref, properties, instances)) {
+    if (!fetchEndpoints(operation, factory, operation.ref, instances)) {
       return fail(operation, "getAllDNSClientCMPIInstances Failed");
     }
-    returnFirstEqual(result, ref, instances, false, &operation.status);
+    returnFirstEqual(operation, instances, false);
   }
   return end(operation);
 }
 
-static CMPIStatus DNSClient_ModifyInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
-                                           const CMPIObjectPath* ref, const CMPIInstance* instance,
-                                           const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSClientProv, context, result, ref);
-  const unsigned int rc = modifyDNSProtocolEndpointCMPIInstance(broker, ref, properties, instance, &operation.status);
-  if (rc != CMPI_RC_OK) {
-    complain(operation, "modifyDNSSettingDataCMPIInstance Failed");
-    operation.status.rc = static_cast<CMPIrc>(rc);
-  }
-  returnDone(result);
-  return {operation.status.rc, nullptr};  // no exit is logged
+static CMPIStatus DNSClient_ModifyInstance(Operation operation, const CMPIInstance* changed) {
+  operation = enter(operation, loggerDNSClientProv);
+  const unsigned int rc =
+      modifyDNSProtocolEndpointCMPIInstance(broker, operation.ref, operation.properties, changed, &operation.status);
+  return endModification(operation, rc);
 }
 
 // True if the call is for the method of the endpoint class; its argument is then in data.
@@ -98,7 +90,8 @@ static void returnValue(const CMPIResult* result, unsigned int number) {
 static CMPIStatus DNSClient_InvokeMethod(CMPIMethodMI*, const CMPIContext* context, const CMPIResult* result,
                                          const CMPIObjectPath* objectPath, const char* method, const CMPIArgs* in,
                                          CMPIArgs*) {
-  Operation operation = ZV_OPERATION(loggerDNSClientProv, context, result, objectPath);
+  Operation operation =
+      enter({.broker = broker, .context = context, .result = result, .ref = objectPath}, loggerDNSClientProv);
   CMPIStatus& status = operation.status;
   const std::string className = classNameOf(objectPath, &status);
   unsigned int value = 0;
@@ -123,9 +116,7 @@ static CMPIStatus DNSClient_InvokeMethod(CMPIMethodMI*, const CMPIContext* conte
 
 static CMPIStatus DNSClient_MethodCleanup(CMPIMethodMI*, const CMPIContext*, CMPIBoolean) { return kNotSupported; }
 
-ZV_REFUSED_INSTANCE_OPERATIONS(DNSClient)
-
 }  // namespace ZV
 
-ZV_INSTANCE_MI(DNSClientProvider, DNSClient)
+ZV_INSTANCE_MI(DNSClientProvider, DNSClient, modifyInstance<DNSClient_ModifyInstance>)
 ZV_METHOD_MI(DNSClientProvider, DNSClient)

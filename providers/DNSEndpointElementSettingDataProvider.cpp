@@ -8,20 +8,24 @@
 #include "factory/DNSSettingDataObjects.h"
 #include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"
-#include "providers/Results.h"
 
 namespace ZV {
 
-static const std::string loggerDNSEndpointElementSettingData = "Zorvagent.DNSEndpointElementSettingDataProvider";
 static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
 static const char* const dnsSettingDataClass = "ZORVA_DNSSettingData";
-static const char* const dnsEndpointElementSettingDataClass = "ZORVA_DNSEndPointElementSettingData";
+static const Association elementSettingData = {"Zorvagent.DNSEndpointElementSettingDataProvider",
+                                               "ZORVA_DNSEndPointElementSettingData",
+                                               "ManagedElement",
+                                               "SettingData",
+                                               newPath,
+                                               "ZORVA_DNSEndPointElementSettingData",
+                                               kNamesTwoOperations};
 
 namespace {
 
 // Both references and the flags: 2 here, 1 for the host-wide settings.
 void setAll(const CMPIInstance* instance, const CMPIObjectPath* endpoint, const CMPIObjectPath* setting) {
-  setPair(instance, "ManagedElement", endpoint, "SettingData", setting);
+  setPair(instance, elementSettingData, endpoint, setting);
   setUint16(instance, "IsCurrent", 2);
   setUint16(instance, "IsDefault", 2);
 }
@@ -44,20 +48,19 @@ bool requireInterfaceOf(const Operation& operation, const std::string& instanceI
 
 }  // namespace
 
-static unsigned short DNSEndpointElementSettingDataCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
-                                                                 const char** properties,
+static unsigned short DNSEndpointElementSettingDataCMPIInstances(Operation operation,
                                                                  std::vector<CMPIInstance*>& instances) {
-  Operation operation = ZV_OPERATION(loggerDNSEndpointElementSettingData, context, nullptr, ref);
+  operation = enter(operation, elementSettingData.category);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> endpoints;
-  if (!fetchEndpoints(operation, factory, ref, endpoints)) {
+  if (!fetchEndpoints(operation, factory, operation.ref, endpoints)) {
     return failBuilder(operation, "Can't get ObjectPaths for DNSClient.             Exiting EnumerateInstanceNames");
   }
   std::vector<CMPIObjectPath*> settings;
-  if (getAllDNSSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
+  if (getAllDNSSettingDataCMPIObjectPaths(broker, operation.ref, &settings, &operation.status) != 0) {
     return failAndLeaveBuilder(operation, "getAllDNSSettingDataCMPIObjectPaths failed");
   }
-  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
   for (CMPIObjectPath* endpoint : counted16(endpoints)) {
     if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Server")) return 1;
     setNameSpace(endpoint, nameSpace);  // its host is not changed
@@ -70,12 +73,11 @@ static unsigned short DNSEndpointElementSettingDataCMPIInstances(const CMPIConte
       if (interfaceName != name) continue;
       setNameSpaceAndHost(setting, nameSpace);
       CMPIInstance* instance = nullptr;
-      if (!newBuilt(operation, nameSpace, dnsEndpointElementSettingDataClass,
+      if (!newBuilt(operation, elementSettingData, nameSpace,
                     "Create CMPIObjectPath failed for                     DNSEndpointElementSettingData.", instance)) {
         return 1;
       }
       if (!isGood(instance)) continue;
-      setPropertyFilter(instance, properties, {"ManagedElement", "SettingData"});
       setAll(instance, endpoint, setting);
       instances.push_back(instance);
     }
@@ -84,188 +86,86 @@ static unsigned short DNSEndpointElementSettingDataCMPIInstances(const CMPIConte
   return 0;
 }
 
+ZV_BUILT_INSTANCES(DNSEndpointElementSettingData, elementSettingData, DNSEndpointElementSettingDataCMPIInstances)
+
 // The paths of the built instances: none is returned before all are built.
-static CMPIStatus DNSEndpointElementSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
-                                                                  const CMPIResult* result, const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(loggerDNSEndpointElementSettingData, context, result, ref);
+static CMPIStatus DNSEndpointElementSettingData_EnumInstanceNames(Operation operation) {
+  operation = enter(operation, elementSettingData.category);
   returnPathsOfBuilt(operation, DNSEndpointElementSettingDataCMPIInstances);
   return end(operation);
 }
 
-static CMPIStatus DNSEndpointElementSettingData_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
-                                                              const CMPIResult* result, const CMPIObjectPath* ref,
-                                                              const char** properties) {
-  const Operation operation = ZV_OPERATION(loggerDNSEndpointElementSettingData, context, result, ref);
-  returnBuilt(operation, DNSEndpointElementSettingDataCMPIInstances, properties);
-  return end(operation);
+// Only Associators logs the interface's name.
+template <typename Found>
+static void logInterface(const Operation& operation, const std::string& name, const Place& place = Place::here()) {
+  if (kReturnsInstances<Found>) logValue(operation, "instance_tokens[1]", name, place);
 }
 
-static CMPIStatus DNSEndpointElementSettingData_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
-                                                            const CMPIResult* result, const CMPIObjectPath* ref,
-                                                            const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSEndpointElementSettingData, context, result, ref);
-  returnEqualBuilt(operation, DNSEndpointElementSettingDataCMPIInstances, properties);
-  return end(operation);
-}
-
-static CMPIStatus DNSEndpointElementSettingData_Associators(CMPIAssociationMI*, const CMPIContext* context,
-                                                            const CMPIResult* result, const CMPIObjectPath* ref,
-                                                            const char* assocClass, const char* resultClass,
-                                                            const char*, const char*, const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSEndpointElementSettingData, context, result, ref);
-  DNSClientObjFactory factory;
-  const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsEndpointElementSettingDataClass),
-                                      resultClass, "Object Path is NULL in Associators.");
-  if (!isGood(farEnd.path)) return operation.status;
+template <typename Found>
+static CMPIStatus associate(Operation& operation, DNSClientObjFactory& factory, const FarEnd& farEnd) {
   std::string interfaceName;
   if (farEnd.className == dnsProtocolEndPointClass) {
-    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndpoint")) return operation.status;
+    if (!passesResultClass(operation.resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndpoint")) {
+      return operation.status;
+    }
     if (!requireInterfaceOf(operation, sourceKey(operation, "InstanceID"), interfaceName)) return operation.status;
-    logValue(operation, "instance_tokens[1]", interfaceName);
-    std::vector<CMPIInstance*> endpoints;
-    if (!fetchEndpoints(operation, factory, farEnd.path, properties, endpoints)) return operation.status;
-    for (const CMPIInstance* endpoint : counted16(endpoints)) {
-      if (propertyText(endpoint, "Name", &operation.status) == interfaceName) returnInstance(result, endpoint);
+    logInterface<Found>(operation, interfaceName);
+    std::vector<Found*> endpoints;
+    if (!fetchEndpoints(operation, factory, farEnd.path, endpoints)) return operation.status;
+    const std::string nameSpace = nameSpaceForPaths<Found>(operation);
+    for (Found* endpoint : counted16(endpoints)) {
+      if (textIn(operation, endpoint, "Name") == interfaceName) returnOnThisHost(operation, endpoint, nameSpace);
     }
   } else if (farEnd.className == dnsSettingDataClass) {
-    if (!passesResultClass(resultClass, dnsSettingDataClass, "CIM_DNSSettingData")) return operation.status;
+    if (!passesResultClass(operation.resultClass, dnsSettingDataClass, "CIM_DNSSettingData")) return operation.status;
     const std::string name = sourceKey(operation, "Name");
-    std::vector<CMPIInstance*> settings;
-    if (getAllDNSSettingDataCMPIInstances(broker, ref, properties, &settings, &operation.status) != 0) {
-      return fail(operation, "getAllDNSSettingDataCMPIInstances Failed");
-    }
-    for (const CMPIInstance* setting : counted16(settings)) {
-      const std::string instanceID = propertyText(setting, "InstanceID", &operation.status);
+    std::vector<Found*> settings;
+    if (!fetchSettings(operation, operation.ref, settings)) return operation.status;
+    for (const Found* setting : counted16(settings)) {
+      const std::string instanceID = textIn(operation, setting, "InstanceID");
       if (!requireInterfaceOf(operation, instanceID, interfaceName)) return operation.status;
-      logValue(operation, "instance_tokens[1]", interfaceName);
-      if (interfaceName == name) returnInstance(result, setting);
+      logInterface<Found>(operation, interfaceName);
+      if (interfaceName == name) returnOne(operation, setting);
     }
   }
   return end(operation);
 }
 
-static CMPIStatus DNSEndpointElementSettingData_AssociatorNames(CMPIAssociationMI*, const CMPIContext* context,
-                                                                const CMPIResult* result, const CMPIObjectPath* ref,
-                                                                const char* assocClass, const char* resultClass,
-                                                                const char*, const char*) {
-  Operation operation = ZV_OPERATION(loggerDNSEndpointElementSettingData, context, result, ref);
-  DNSClientObjFactory factory;
-  const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsEndpointElementSettingDataClass),
-                                      resultClass, "Object Path is NULL in Associators.");
-  if (!isGood(farEnd.path)) return operation.status;
+template <typename Found>
+static CMPIStatus refer(Operation& operation, DNSClientObjFactory& factory, const ReferenceParts& parts) {
+  const auto& [farEnd, nameSpace, association] = parts;
   std::string interfaceName;
-  if (farEnd.className == dnsProtocolEndPointClass) {
-    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndpoint")) return operation.status;
+  if (farEnd.className == dnsSettingDataClass) {
+    const std::string name = sourceKey(operation, "Name");
+    std::vector<CMPIObjectPath*> settings;
+    if (!fetchSettings(operation, farEnd.path, settings)) return operation.status;
+    for (CMPIObjectPath* setting : counted16(settings)) {
+      const CMPIInstance* reference = nullptr;
+      // ReferenceNames makes an instance for every candidate, matching or not.
+      if (!kReturnsInstances<Found>) reference = newInstance(broker, association, &operation.status);
+      const std::string instanceID = keyText(setting, "InstanceID", &operation.status);
+      if (!requireInterfaceOf(operation, instanceID, interfaceName)) return operation.status;
+      if (interfaceName != name) continue;
+      setNameSpaceAndHost(setting, nameSpace);
+      if (kReturnsInstances<Found>) reference = newInstance(broker, association, &operation.status);
+      setAll(reference, operation.ref, setting);
+      deliver<Found>(operation, reference, nameSpace);
+    }
+  } else if (farEnd.className == dnsProtocolEndPointClass) {
     if (!requireInterfaceOf(operation, sourceKey(operation, "InstanceID"), interfaceName)) return operation.status;
     std::vector<CMPIObjectPath*> endpoints;
     if (!fetchEndpoints(operation, factory, farEnd.path, endpoints)) return operation.status;
-    const std::string nameSpace = nameSpaceOf(ref, &operation.status);
     for (CMPIObjectPath* endpoint : counted16(endpoints)) {
       if (keyText(endpoint, "Name", &operation.status) != interfaceName) continue;
       setNameSpaceAndHost(endpoint, nameSpace);
-      returnObjectPath(result, endpoint);
-    }
-  } else if (farEnd.className == dnsSettingDataClass) {
-    if (!passesResultClass(resultClass, dnsSettingDataClass, "CIM_DNSSettingData")) return operation.status;
-    const std::string name = sourceKey(operation, "Name");
-    std::vector<CMPIObjectPath*> settings;
-    if (getAllDNSSettingDataCMPIObjectPaths(broker, ref, &settings, &operation.status) != 0) {
-      return fail(operation, "getAllDNSSettingDataCMPIObjectPaths Failed");
-    }
-    for (const CMPIObjectPath* setting : counted16(settings)) {
-      const std::string instanceID = keyText(setting, "InstanceID", &operation.status);
-      if (!requireInterfaceOf(operation, instanceID, interfaceName)) return operation.status;
-      if (interfaceName == name) returnObjectPath(result, setting);
-    }
-  }
-  return end(operation);
-}
-
-// The references of an endpoint to its settings.
-static bool referToSettings(Operation& operation, const ReferenceParts& parts) {
-  const std::string name = sourceKey(operation, "Name");
-  std::vector<CMPIObjectPath*> settings;
-  if (getAllDNSSettingDataCMPIObjectPaths(broker, parts.farEnd.path, &settings, &operation.status) != 0) {
-    return complain(operation, "getAllDNSSettingDataCMPIObjectPaths Failed");
-  }
-  for (CMPIObjectPath* setting : counted16(settings)) {
-    std::string interfaceName;
-    const std::string instanceID = keyText(setting, "InstanceID", &operation.status);
-    if (!requireInterfaceOf(operation, instanceID, interfaceName)) return false;
-    if (interfaceName != name) continue;
-    setNameSpaceAndHost(setting, parts.nameSpace);
-    const CMPIInstance* reference = newInstance(broker, parts.association, &operation.status);
-    setAll(reference, operation.ref, setting);
-    deliverInstance(operation, reference, parts.nameSpace);
-  }
-  return true;
-}
-
-// The names of the references: an instance is made for every candidate, matching or not.
-static bool nameSettings(Operation& operation, const ReferenceParts& parts) {
-  const std::string name = sourceKey(operation, "Name");
-  std::vector<CMPIObjectPath*> settings;
-  if (getAllDNSSettingDataCMPIObjectPaths(broker, parts.farEnd.path, &settings, &operation.status) != 0) {
-    return complain(operation, "getAllDNSSettingDataCMPIObjectPaths Failed");
-  }
-  for (CMPIObjectPath* setting : counted16(settings)) {
-    const CMPIInstance* reference = newInstance(broker, parts.association, &operation.status);
-    std::string interfaceName;
-    const std::string instanceID = keyText(setting, "InstanceID", &operation.status);
-    if (!requireInterfaceOf(operation, instanceID, interfaceName)) return false;
-    if (interfaceName != name) continue;
-    setNameSpaceAndHost(setting, parts.nameSpace);
-    setAll(reference, operation.ref, setting);
-    deliverPath(operation, reference, parts.nameSpace);
-  }
-  return true;
-}
-
-using WalkSettings = bool (*)(Operation& operation, const ReferenceParts& parts);
-
-static CMPIStatus refer(Operation operation, WalkSettings walkSettings, Deliver deliver) {
-  DNSClientObjFactory factory;
-  const ReferenceParts parts =
-      resolveReferences(operation, factory, dnsEndpointElementSettingDataClass, newPath,
-                        dnsEndpointElementSettingDataClass, "Object Path is NULL in References.");
-  const FarEnd& farEnd = parts.farEnd;
-  if (!isGood(farEnd.path)) return operation.status;
-  if (farEnd.className == dnsSettingDataClass) {
-    if (!walkSettings(operation, parts)) return operation.status;
-  } else if (farEnd.className == dnsProtocolEndPointClass) {
-    std::string interfaceName;
-    if (!requireInterfaceOf(operation, sourceKey(operation, "InstanceID"), interfaceName)) return operation.status;
-    std::vector<CMPIObjectPath*> endpoints;
-    if (!fetchEndpoints(operation, factory, farEnd.path, endpoints)) return operation.status;
-    for (CMPIObjectPath* endpoint : counted16(endpoints)) {
-      if (keyText(endpoint, "Name", &operation.status) != interfaceName) continue;
-      setNameSpaceAndHost(endpoint, parts.nameSpace);
-      const CMPIInstance* reference = newInstance(broker, parts.association, &operation.status);
+      const CMPIInstance* reference = newInstance(broker, association, &operation.status);
       setAll(reference, endpoint, operation.ref);
-      deliver(operation, reference, parts.nameSpace);
+      deliver<Found>(operation, reference, nameSpace);
     }
   }
   return end(operation);
 }
-
-static CMPIStatus DNSEndpointElementSettingData_References(CMPIAssociationMI*, const CMPIContext* context,
-                                                           const CMPIResult* result, const CMPIObjectPath* ref,
-                                                           const char*, const char*, const char**) {
-  return refer(ZV_OPERATION(loggerDNSEndpointElementSettingData, context, result, ref), referToSettings,
-               deliverInstance);
-}
-
-static CMPIStatus DNSEndpointElementSettingData_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
-                                                               const CMPIResult* result, const CMPIObjectPath* ref,
-                                                               const char*, const char*) {
-  return refer(ZV_OPERATION(loggerDNSEndpointElementSettingData, context, result, ref), nameSettings, deliverPath);
-}
-
-ZV_REFUSED_INSTANCE_OPERATIONS(DNSEndpointElementSettingData)
-ZV_REFUSED_MODIFICATION(DNSEndpointElementSettingData)
-ZV_ASSOCIATION_CLEANUP(DNSEndpointElementSettingData)
 
 }  // namespace ZV
 
-ZV_INSTANCE_MI(DNSEndPointElementSettingDataProvider, DNSEndpointElementSettingData)
-ZV_ASSOCIATION_MI(DNSEndPointElementSettingDataProvider, DNSEndpointElementSettingData)
+ZV_ASSOCIATION_PROVIDER(DNSEndPointElementSettingDataProvider, DNSEndpointElementSettingData, elementSettingData)

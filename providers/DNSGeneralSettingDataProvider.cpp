@@ -11,57 +11,47 @@ static const std::string loggerDNSGeneralSettingDataProv = "Zorvagent.DNSGeneral
 
 // A failure leaves the result open: no returnDone and no exit in the log. The status is what the broker's calls left.
 
-static CMPIStatus DNSGeneralSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
-                                                          const CMPIResult* result, const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(loggerDNSGeneralSettingDataProv, context, result, ref);
+static CMPIStatus DNSGeneralSettingData_EnumInstanceNames(Operation operation) {
+  operation = enter(operation, loggerDNSGeneralSettingDataProv);
   std::vector<CMPIObjectPath*> paths;
-  if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, ref, &paths, &operation.status) != 0) {
-    return fail(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed");
-  }
-  returnAll(result, paths);
+  if (!fetchGeneralSettings(operation, operation.ref, paths)) return operation.status;
+  returnAll(operation, paths);
   return end(operation);
 }
 
-static CMPIStatus DNSGeneralSettingData_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
-                                                      const CMPIResult* result, const CMPIObjectPath* ref,
-                                                      const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSGeneralSettingDataProv, context, result, ref);
+static CMPIStatus DNSGeneralSettingData_EnumInstances(Operation operation) {
+  operation = enter(operation, loggerDNSGeneralSettingDataProv);
   std::vector<CMPIInstance*> instances;
-  if (getAllDNSGeneralSettingDataCMPIInstances(broker, ref, properties, &instances, &operation.status) != 0) {
-    return fail(operation, "getAllDNSGeneralSettingDataCMPIInstances Failed");
-  }
-  returnAll(result, instances);
+  if (!fetchGeneralSettings(operation, operation.ref, instances)) return operation.status;
+  returnAll(operation, instances);
   return end(operation);
 }
 
-static CMPIStatus DNSGeneralSettingData_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
-                                                    const CMPIResult* result, const CMPIObjectPath* ref,
-                                                    const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSGeneralSettingDataProv, context, result, ref);
+static CMPIStatus DNSGeneralSettingData_GetInstance(Operation operation) {
+  operation = enter(operation, loggerDNSGeneralSettingDataProv);
   std::vector<CMPIInstance*> instances;
-  if (getOneDNSGeneralSettingDataCMPIInstance(broker, ref, properties, &instances, &operation.status) != 0) {
+  if (getOneDNSGeneralSettingDataCMPIInstance(broker, operation.ref, operation.properties, &instances,
+                                              &operation.status) != 0) {
     return fail(operation, "getOneDNSGeneralSettingDataCMPIInstance Failed");
   }
-  returnAll(result, instances);
+  returnAll(operation, instances);
   return end(operation);
 }
 
 // This modification does not return its own rc: the client gets the status that the broker's calls left, and a failure
 // leaves the result open.
-static CMPIStatus DNSGeneralSettingData_ModifyInstance(CMPIInstanceMI*, const CMPIContext* context,
-                                                       const CMPIResult* result, const CMPIObjectPath* ref,
-                                                       const CMPIInstance* instance, const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSGeneralSettingDataProv, context, result, ref);
-  const unsigned int rc = modifyDNSGeneralSettingDataCMPIInstance(broker, ref, properties, instance, &operation.status);
+static CMPIStatus DNSGeneralSettingData_ModifyInstance(Operation operation, const CMPIInstance* changed) {
+  operation = enter(operation, loggerDNSGeneralSettingDataProv);
+  const unsigned int rc =
+      modifyDNSGeneralSettingDataCMPIInstance(broker, operation.ref, operation.properties, changed, &operation.status);
   if (rc != CMPI_RC_OK) {
     return fail(operation, "modifyDNSSettingDataCMPIInstance Failed");
   }
-  returnDone(result);
+  returnDone(operation.result);
   return {operation.status.rc, nullptr};  // no exit is logged
 }
 
-ZV_REFUSED_INSTANCE_OPERATIONS(DNSGeneralSettingData)
-
 }  // namespace ZV
 
-ZV_INSTANCE_MI(DNSGeneralSettingDataProvider, DNSGeneralSettingData)
+ZV_INSTANCE_MI(DNSGeneralSettingDataProvider, DNSGeneralSettingData,
+               modifyInstance<DNSGeneralSettingData_ModifyInstance>)

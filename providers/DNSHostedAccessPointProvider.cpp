@@ -10,31 +10,33 @@
 #include "factory/DNSClientObjFactory.h"
 #include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"
-#include "providers/Results.h"
 
 namespace ZV {
 
-static const std::string loggerDNSHostAccessPoint = "Zorvagent.DNSHostedAccessPointProvider";
 static const char* const computerSystemClass = "ZORVA_ComputerSystem";
 static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
-static const char* const dnsHostedAccessPointClass = "ZORVA_DNSHostedAccessPoint";
+static const Association hostedAccessPoint = {"Zorvagent.DNSHostedAccessPointProvider",
+                                              "ZORVA_DNSHostedAccessPoint",
+                                              "Antecedent",
+                                              "Dependent",
+                                              newHostPath,
+                                              "ZORVA_DNSHostedAccessPoint",
+                                              kNamesEachOperation};
 
-static unsigned short DNSHostedAccessPointCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
-                                                        const char** properties,
-                                                        std::vector<CMPIInstance*>& instances) {
-  Operation operation = ZV_OPERATION(loggerDNSHostAccessPoint, context, nullptr, ref);
+static unsigned short DNSHostedAccessPointCMPIInstances(Operation operation, std::vector<CMPIInstance*>& instances) {
+  operation = enter(operation, hostedAccessPoint.category);
   DNSClientObjFactory factory;
-  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
   const CMPIEnumeration* systems = nullptr;
-  if (!askForNames(operation, nameSpace, computerSystemClass, "Create CMPIObjectPath failed for ComputerSystem.",
-                   systems)) {
+  if (!askForAll<CMPIObjectPath>(operation, nameSpace, computerSystemClass,
+                                 "Create CMPIObjectPath failed for ComputerSystem.", systems)) {
     return 1;
   }
   while (hasNext(systems, &operation.status)) {
     const CMPIObjectPath* system = nextPath(systems, &operation.status);
     const std::string name = keyText(system, "Name", &operation.status);
     std::vector<CMPIObjectPath*> endpoints;
-    if (!fetchEndpoints(operation, factory, ref, endpoints)) {
+    if (!fetchEndpoints(operation, factory, operation.ref, endpoints)) {
       return failBuilder(operation,
                          "***Can't get DNS Client ObjectPaths.                 Exiting EnumerateInstanceNames***");
     }
@@ -42,14 +44,14 @@ static unsigned short DNSHostedAccessPointCMPIInstances(const CMPIContext* conte
       if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Client")) return 1;
       if (name.find(keyText(endpoint, "SystemName", &operation.status)) == std::string::npos) continue;
       setNameSpace(endpoint, nameSpace);
-      CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsHostedAccessPointClass, &operation.status);
+      CMPIObjectPath* path = newHostPath(broker, nameSpace, hostedAccessPoint.className, &operation.status);
       if (isMissing(operation, path,
                     "Create CMPIObjectPath failed for                     dnsHostedAccessPointClass.")) {
         return 1;
       }
       CMPIInstance* instance = newInstance(broker, path, &operation.status);
-      setPropertyFilter(instance, properties, {"Antecedent", "Dependent"});
-      setPair(instance, "Antecedent", system, "Dependent", endpoint);
+      setPropertyFilter(instance, operation.properties, {"Antecedent", "Dependent"});
+      setPair(instance, hostedAccessPoint, system, endpoint);
       instances.push_back(instance);  // good or not
     }
   }
@@ -57,52 +59,36 @@ static unsigned short DNSHostedAccessPointCMPIInstances(const CMPIContext* conte
   return 0;
 }
 
+ZV_BUILT_INSTANCES(DNSHostedAccessPoint, hostedAccessPoint, DNSHostedAccessPointCMPIInstances)
+
 // Returns each path at once: after a later failure these paths are already delivered, and the result stays open.
-static CMPIStatus DNSHostedAccessPoint_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
-                                                         const CMPIResult* result, const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(loggerDNSHostAccessPoint, context, result, ref);
+static CMPIStatus DNSHostedAccessPoint_EnumInstanceNames(Operation operation) {
+  operation = enter(operation, hostedAccessPoint.category);
   DNSClientObjFactory factory;
-  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
   const CMPIEnumeration* systems = nullptr;
-  if (!askForNames(operation, nameSpace, computerSystemClass, "Create CMPIObjectPath failed for ComputerSystem.",
-                   systems)) {
+  if (!askForAll<CMPIObjectPath>(operation, nameSpace, computerSystemClass,
+                                 "Create CMPIObjectPath failed for ComputerSystem.", systems)) {
     return operation.status;
   }
   while (hasNext(systems, &operation.status)) {
     const CMPIObjectPath* system = nextPath(systems, &operation.status);
     const std::string name = keyText(system, "Name", &operation.status);
     std::vector<CMPIObjectPath*> endpoints;
-    if (!fetchEndpoints(operation, factory, ref, endpoints)) {
+    if (!fetchEndpoints(operation, factory, operation.ref, endpoints)) {
       return fail(operation, "***Can't get DNS Client ObjectPaths.                  Exiting EnumerateInstanceNames***");
     }
     for (CMPIObjectPath* endpoint : counted16(endpoints)) {
       if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Client")) return operation.status;
       if (name != keyText(endpoint, "SystemName", &operation.status)) continue;  // the builder also accepts a part
       setNameSpace(endpoint, nameSpace);
-      CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsHostedAccessPointClass, &operation.status);
-      if (isMissing(operation, path,
-                    "Create CMPIObjectPath failed for                     dnsHostedAccessPointClass.")) {
+      if (!returnPair(operation, hostedAccessPoint, nameSpace,
+                      "Create CMPIObjectPath failed for                     dnsHostedAccessPointClass.", system,
+                      endpoint)) {
         return operation.status;
       }
-      returnPairPath(operation, path, "Antecedent", system, "Dependent", endpoint);
     }
   }
-  return end(operation);
-}
-
-static CMPIStatus DNSHostedAccessPoint_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
-                                                     const CMPIResult* result, const CMPIObjectPath* ref,
-                                                     const char** properties) {
-  const Operation operation = ZV_OPERATION(loggerDNSHostAccessPoint, context, result, ref);
-  returnBuilt(operation, DNSHostedAccessPointCMPIInstances, properties);
-  return end(operation);
-}
-
-static CMPIStatus DNSHostedAccessPoint_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
-                                                   const CMPIResult* result, const CMPIObjectPath* ref,
-                                                   const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSHostAccessPoint, context, result, ref);
-  returnEqualBuilt(operation, DNSHostedAccessPointCMPIInstances, properties);
   return end(operation);
 }
 
@@ -112,84 +98,46 @@ static bool isOfComputerSystem(const std::string& systemCreationClassName) {
   return strcasecmp(systemCreationClassName.c_str(), computerSystemClass) == 0;
 }
 
-static CMPIStatus DNSHostedAccessPoint_Associators(CMPIAssociationMI*, const CMPIContext* context,
-                                                   const CMPIResult* result, const CMPIObjectPath* ref,
-                                                   const char* assocClass, const char* resultClass, const char*,
-                                                   const char*, const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSHostAccessPoint, context, result, ref);
-  DNSClientObjFactory factory;
-  const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsHostedAccessPointClass),
-                                      resultClass, "Object Path is NULL in Associators.");
-  if (!isGood(farEnd.path)) return operation.status;
+template <typename Found>
+static CMPIStatus associate(Operation& operation, DNSClientObjFactory& factory, const FarEnd& farEnd) {
   if (farEnd.className == computerSystemClass) {
     const std::string systemName = sourceKey(operation, "SystemName");
-    if (!passesResultClass(resultClass, computerSystemClass, "CIM_ComputerSystem")) return operation.status;
+    if (!passesResultClass(operation.resultClass, computerSystemClass, "CIM_ComputerSystem")) return operation.status;
     const CMPIEnumeration* systems = nullptr;
-    if (!askForInstances(operation, farEnd.path, "CBEnumInstances Failed for the target Class", systems)) {
+    if (!askFor<Found>(operation, farEnd.path, systems,
+                       either<Found>("CBEnumInstances Failed for the target Class",
+                                     "CBEnumInstanceNames Failed for the target Class"))) {
       return operation.status;
     }
     while (hasNext(systems, &operation.status)) {
-      const CMPIInstance* system = nextInstance(systems, &operation.status);
-      const CMPIObjectPath* path = objectPathOf(system, &operation.status);
-      if (keyText(path, "Name", &operation.status) == systemName) returnInstance(result, system);
+      Found* system = next<Found>(operation, systems);
+      if (keyText(pathOf(operation, system), "Name", &operation.status) == systemName) returnOne(operation, system);
     }
   } else if (farEnd.className == dnsProtocolEndPointClass) {
     const std::string name = sourceKey(operation, "Name");
-    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndpoint")) return operation.status;
-    std::vector<CMPIInstance*> endpoints;
-    if (!fetchEndpoints(operation, factory, farEnd.path, properties, endpoints)) {
-      return fail(operation, "***Can't get DNS Client ObjectPaths.                 Exiting Associators***");
+    if (!passesResultClass(operation.resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndpoint")) {
+      return operation.status;
     }
-    for (const CMPIInstance* endpoint : counted16(endpoints)) {
-      if (propertyText(endpoint, "SystemName", &operation.status) != name) continue;
-      if (!isOfComputerSystem(propertyText(endpoint, "SystemCreationClassName", &operation.status))) continue;
-      returnInstance(result, endpoint);
-    }
-  }
-  return endWithoutDone(operation);
-}
-
-static CMPIStatus DNSHostedAccessPoint_AssociatorNames(CMPIAssociationMI*, const CMPIContext* context,
-                                                       const CMPIResult* result, const CMPIObjectPath* ref,
-                                                       const char* assocClass, const char* resultClass, const char*,
-                                                       const char*) {
-  Operation operation = ZV_OPERATION(loggerDNSHostAccessPoint, context, result, ref);
-  DNSClientObjFactory factory;
-  const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsHostedAccessPointClass),
-                                      resultClass, "Object Path is NULL in AssociatorNames.");
-  if (!isGood(farEnd.path)) return operation.status;
-  if (farEnd.className == computerSystemClass) {
-    const std::string systemName = sourceKey(operation, "SystemName");
-    if (!passesResultClass(resultClass, computerSystemClass, "CIM_ComputerSystem")) return operation.status;
-    const CMPIEnumeration* systems = nullptr;
-    if (!askForNames(operation, farEnd.path, systems)) return operation.status;
-    while (hasNext(systems, &operation.status)) {
-      const CMPIObjectPath* system = nextPath(systems, &operation.status);
-      if (keyText(system, "Name", &operation.status) == systemName) returnObjectPath(result, system);
-    }
-  } else if (farEnd.className == dnsProtocolEndPointClass) {
-    const std::string name = sourceKey(operation, "Name");
-    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndpoint")) return operation.status;
-    std::vector<CMPIObjectPath*> endpoints;
+    std::vector<Found*> endpoints;
     if (!fetchEndpoints(operation, factory, farEnd.path, endpoints)) {
-      return fail(operation, "***Can't get Service processor ObjectPaths.                 Exiting AssociatorNames***");
+      return fail(operation,
+                  either<Found>("***Can't get DNS Client ObjectPaths.                 Exiting Associators***",
+                                "***Can't get Service processor ObjectPaths.                 Exiting "
+                                "AssociatorNames***"));
     }
-    const std::string nameSpace = nameSpaceOf(ref, &operation.status);
-    for (CMPIObjectPath* endpoint : counted16(endpoints)) {
-      if (keyText(endpoint, "SystemName", &operation.status) != name) continue;
-      if (!isOfComputerSystem(keyText(endpoint, "SystemCreationClassName", &operation.status))) continue;
-      setNameSpaceAndHost(endpoint, nameSpace);
-      returnObjectPath(result, endpoint);
+    const std::string nameSpace = nameSpaceForPaths<Found>(operation);
+    for (Found* endpoint : counted16(endpoints)) {
+      if (textIn(operation, endpoint, "SystemName") != name) continue;
+      if (!isOfComputerSystem(textIn(operation, endpoint, "SystemCreationClassName"))) continue;
+      returnOnThisHost(operation, endpoint, nameSpace);
     }
   }
   return endWithoutDone(operation);
 }
 
-static CMPIStatus refer(Operation operation, const char* noFarEnd, Deliver deliver) {
-  DNSClientObjFactory factory;
-  const auto [farEnd, nameSpace, association] = resolveReferences(operation, factory, dnsHostedAccessPointClass,
-                                                                  newHostPath, dnsHostedAccessPointClass, noFarEnd);
-  if (!isGood(farEnd.path)) return operation.status;
+template <typename Found>
+static CMPIStatus refer(Operation& operation, DNSClientObjFactory& factory, const ReferenceParts& parts) {
+  const auto& [farEnd, nameSpace, association] = parts;
   if (farEnd.className == dnsProtocolEndPointClass) {
     const std::string name = sourceKey(operation, "Name");
     std::vector<CMPIObjectPath*> endpoints;
@@ -198,44 +146,25 @@ static CMPIStatus refer(Operation operation, const char* noFarEnd, Deliver deliv
     }
     for (CMPIObjectPath* endpoint : counted16(endpoints)) {
       if (keyText(endpoint, "SystemName", &operation.status) != name) continue;
-      CMPIInstance* reference = newInstance(broker, association, &operation.status);
+      const CMPIInstance* reference = newInstance(broker, association, &operation.status);
       setNameSpaceAndHost(endpoint, nameSpace);
-      setPair(reference, "Antecedent", operation.ref, "Dependent", endpoint);
-      deliver(operation, reference, nameSpace);
+      setPair(reference, hostedAccessPoint, operation.ref, endpoint);
+      deliverOnThisHost<Found>(operation, reference, nameSpace);
     }
   } else if (farEnd.className == computerSystemClass) {
     const std::string systemName = sourceKey(operation, "SystemName");
     const CMPIEnumeration* systems = nullptr;
-    if (!askForNames(operation, farEnd.path, systems)) return operation.status;
+    if (!askFor<CMPIObjectPath>(operation, farEnd.path, systems)) return operation.status;
     while (hasNext(systems, &operation.status)) {
       const CMPIObjectPath* system = nextPath(systems, &operation.status);
       if (keyText(system, "Name", &operation.status) != systemName) continue;
-      const CMPIInstance* reference = newPair(operation, association, "Antecedent", system, "Dependent", operation.ref);
-      deliver(operation, reference, nameSpace);
+      const CMPIInstance* reference = newPair(operation, hostedAccessPoint, association, system, operation.ref);
+      deliverOnThisHost<Found>(operation, reference, nameSpace);
     }
   }
   return endWithoutDone(operation);
 }
 
-static CMPIStatus DNSHostedAccessPoint_References(CMPIAssociationMI*, const CMPIContext* context,
-                                                  const CMPIResult* result, const CMPIObjectPath* ref, const char*,
-                                                  const char*, const char**) {
-  return refer(ZV_OPERATION(loggerDNSHostAccessPoint, context, result, ref), "Object Path is NULL in References.",
-               deliverInstance);
-}
-
-static CMPIStatus DNSHostedAccessPoint_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
-                                                      const CMPIResult* result, const CMPIObjectPath* ref, const char*,
-                                                      const char*) {
-  return refer(ZV_OPERATION(loggerDNSHostAccessPoint, context, result, ref), "Object Path is NULL in ReferenceNames.",
-               deliverPathOnThisHost);
-}
-
-ZV_REFUSED_INSTANCE_OPERATIONS(DNSHostedAccessPoint)
-ZV_REFUSED_MODIFICATION(DNSHostedAccessPoint)
-ZV_ASSOCIATION_CLEANUP(DNSHostedAccessPoint)
-
 }  // namespace ZV
 
-ZV_INSTANCE_MI(DNSHostedAccessPointProvider, DNSHostedAccessPoint)
-ZV_ASSOCIATION_MI(DNSHostedAccessPointProvider, DNSHostedAccessPoint)
+ZV_ASSOCIATION_PROVIDER(DNSHostedAccessPointProvider, DNSHostedAccessPoint, hostedAccessPoint)

@@ -4,43 +4,46 @@
 #include "factory/DNSClientObjFactory.h"
 #include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"
-#include "providers/Results.h"
 
 namespace ZV {
 
-static const std::string loggerDNSRemoteAccess = "Zorvagent.DNSRemoteAccessAvailableToElementProvider";
 static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
 static const char* const remoteServiceAccessPointClass = "ZORVA_RemoteServiceAccessPoint";
-static const char* const remoteAccessAvailableToElementClass = "ZORVA_RemoteAccessAvailableToElement";
+static const Association remoteAccess = {"Zorvagent.DNSRemoteAccessAvailableToElementProvider",
+                                         "ZORVA_RemoteAccessAvailableToElement",
+                                         "Antecedent",
+                                         "Dependent",
+                                         newHostPath,
+                                         "ZORVA_RemoteAccessAvailableToElement",
+                                         kNamesEachOperation};
 
-static unsigned short RemoteAccessAvailableToElementCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
-                                                                  const char** properties,
+static unsigned short RemoteAccessAvailableToElementCMPIInstances(Operation operation,
                                                                   std::vector<CMPIInstance*>& instances) {
-  Operation operation = ZV_UNMARKED_OPERATION(loggerDNSRemoteAccess, context, nullptr, ref);
-  const FlowLog flow(loggerDNSRemoteAccess, ZV_HERE, " ref=", ref, " properties=", properties,
+  operation = named(operation, remoteAccess.category);
+  const FlowLog flow(remoteAccess.category, ZV_HERE, " ref=", operation.ref, " properties=", operation.properties,
                      " instances=", &instances);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> servers;
-  if (!fetchServers(operation, factory, ref, servers)) {
+  if (!fetchServers(operation, factory, operation.ref, servers)) {
     return failBuilder(operation, "***Can't get DNS Server ObjectPaths.             Exiting EnumerateInstanceNames***");
   }
-  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
   for (CMPIObjectPath* server : counted16(servers)) {
     if (isMissing(operation, server, "CMPIObjectPath is NULL for DNS Server")) return 1;
     std::vector<CMPIObjectPath*> clients;  // made again for every server
-    if (!fetchEndpoints(operation, factory, ref, clients)) {
+    if (!fetchEndpoints(operation, factory, operation.ref, clients)) {
       return failBuilder(operation,
                          "***Can't get ObjectPaths for DNSClient.                 Exiting EnumerateInstanceNames***");
     }
     for (const CMPIObjectPath* client : counted16(clients)) {
       if (isMissing(operation, client, "CMPIObjectPath is NULL for DNSClient")) return 1;
-      CMPIObjectPath* path = newHostPath(broker, nameSpace, remoteAccessAvailableToElementClass, nullptr);
+      CMPIObjectPath* path = newHostPath(broker, nameSpace, remoteAccess.className, nullptr);
       if (isMissing(operation, path, "Create CMPIObjectPath failed for RemoteAccessAvailableToElement.")) return 1;
       CMPIInstance* instance = newInstance(broker, path, nullptr);
       instances.push_back(instance);  // good or not
       if (!isGood(instance)) continue;
-      setPropertyFilter(instance, properties, {"Antecedent", "Dependent"});
-      setPair(instance, "Antecedent", server, "Dependent", client);
+      setPropertyFilter(instance, operation.properties, {"Antecedent", "Dependent"});
+      setPair(instance, remoteAccess, server, client);
       setUint16(instance, "OrderOfAccess", factory.getOrderOfAccess(broker, server, &operation.status));
     }
   }
@@ -55,112 +58,72 @@ static CMPIStatus endEnumeration(const Operation& operation, const Place& place 
   return operation.status;
 }
 
+static CMPIStatus DNSRemoteAccessAvailableToElement_EnumInstances(Operation operation) {
+  operation = enter(operation, remoteAccess.category);
+  returnBuilt(operation, RemoteAccessAvailableToElementCMPIInstances);
+  return endEnumeration(operation);
+}
+
+static CMPIStatus DNSRemoteAccessAvailableToElement_GetInstance(Operation operation) {
+  operation = enter(operation, remoteAccess.category);
+  returnEqualBuilt(operation, RemoteAccessAvailableToElementCMPIInstances);
+  return end(operation);
+}
+
 // Returns each path at once: after a later failure these paths are already delivered, and the result stays open.
-static CMPIStatus DNSRemoteAccessAvailableToElement_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
-                                                                      const CMPIResult* result,
-                                                                      const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(loggerDNSRemoteAccess, context, result, ref);
+static CMPIStatus DNSRemoteAccessAvailableToElement_EnumInstanceNames(Operation operation) {
+  operation = enter(operation, remoteAccess.category);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> servers;
-  if (!fetchServers(operation, factory, ref, servers)) {
+  if (!fetchServers(operation, factory, operation.ref, servers)) {
     return fail(operation, "***Can't get DNS Server's ObjectPaths.             Exiting EnumerateInstanceNames***");
   }
-  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
   for (CMPIObjectPath* server : counted16(servers)) {
     if (isMissing(operation, server, "CMPIObjectPath is NULL for DNS Server")) return operation.status;
     setNameSpace(server, nameSpace);
     std::vector<CMPIObjectPath*> clients;
-    if (!fetchEndpoints(operation, factory, ref, clients)) {
+    if (!fetchEndpoints(operation, factory, operation.ref, clients)) {
       return fail(operation,
                   "***Can't get ObjectPaths for DNSClient.                 Exiting EnumerateInstanceNames***");
     }
     for (CMPIObjectPath* client : counted16(clients)) {
       if (isMissing(operation, client, "CMPIObjectPath is NULL for DNSClient")) return operation.status;
       setNameSpace(client, nameSpace);
-      CMPIObjectPath* path = newHostPath(broker, nameSpace, remoteAccessAvailableToElementClass, &operation.status);
-      if (isMissing(operation, path, "Create CMPIObjectPath failed for RemoteAccessAvailableToElement.")) {
+      if (!returnPair(operation, remoteAccess, nameSpace,
+                      "Create CMPIObjectPath failed for RemoteAccessAvailableToElement.", server, client)) {
         return operation.status;
       }
-      returnPairPath(operation, path, "Antecedent", server, "Dependent", client);
     }
   }
   return endEnumeration(operation);
-}
-
-static CMPIStatus DNSRemoteAccessAvailableToElement_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
-                                                                  const CMPIResult* result, const CMPIObjectPath* ref,
-                                                                  const char** properties) {
-  const Operation operation = ZV_OPERATION(loggerDNSRemoteAccess, context, result, ref);
-  returnBuilt(operation, RemoteAccessAvailableToElementCMPIInstances, properties);
-  return endEnumeration(operation);
-}
-
-static CMPIStatus DNSRemoteAccessAvailableToElement_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
-                                                                const CMPIResult* result, const CMPIObjectPath* ref,
-                                                                const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSRemoteAccess, context, result, ref);
-  returnEqualBuilt(operation, RemoteAccessAvailableToElementCMPIInstances, properties);
-  return end(operation);
 }
 
 // The four operations below never call returnDone.
 
 // Returns the objects of the far end that are on the source's system.
-static CMPIStatus DNSRemoteAccessAvailableToElement_Associators(CMPIAssociationMI*, const CMPIContext* context,
-                                                                const CMPIResult* result, const CMPIObjectPath* ref,
-                                                                const char* assocClass, const char* resultClass,
-                                                                const char*, const char*, const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSRemoteAccess, context, result, ref);
-  DNSClientObjFactory factory;
-  const FarEnd farEnd =
-      resolveFarEnd(operation, factory, associationOr(assocClass, remoteAccessAvailableToElementClass), resultClass,
-                    "Object Path is NULL in Associators.");
-  if (!isGood(farEnd.path)) return operation.status;
+template <typename Found>
+static CMPIStatus associate(Operation& operation, DNSClientObjFactory& factory, const FarEnd& farEnd) {
   const std::string systemName = sourceKey(operation, "SystemName");
-  std::vector<CMPIInstance*> instances;
+  std::vector<Found*> objects;
   if (farEnd.className == remoteServiceAccessPointClass) {
-    if (!passesResultClass(resultClass, remoteServiceAccessPointClass, "CIM_RemoteServiceAccessPoint")) {
+    if (!passesResultClass(operation.resultClass, remoteServiceAccessPointClass, "CIM_RemoteServiceAccessPoint")) {
       return operation.status;
     }
-    if (!fetchServers(operation, factory, farEnd.path, properties, instances)) return operation.status;
+    if (!fetchServers(operation, factory, farEnd.path, objects)) return operation.status;
   } else if (farEnd.className == dnsProtocolEndPointClass) {
-    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) return operation.status;
-    if (!fetchEndpoints(operation, factory, farEnd.path, properties, instances)) {
-      return fail(operation, "getAllDNSClientCMPIInstances Failed");
-    }
-  }
-  for (const CMPIInstance* instance : counted16(instances)) {
-    if (propertyText(instance, "SystemName", &operation.status) == systemName) returnInstance(result, instance);
-  }
-  return endWithoutDone(operation);
-}
-
-static CMPIStatus DNSRemoteAccessAvailableToElement_AssociatorNames(CMPIAssociationMI*, const CMPIContext* context,
-                                                                    const CMPIResult* result, const CMPIObjectPath* ref,
-                                                                    const char* assocClass, const char* resultClass,
-                                                                    const char*, const char*) {
-  Operation operation = ZV_OPERATION(loggerDNSRemoteAccess, context, result, ref);
-  DNSClientObjFactory factory;
-  const FarEnd farEnd =
-      resolveFarEnd(operation, factory, associationOr(assocClass, remoteAccessAvailableToElementClass), resultClass,
-                    "Object Path is NULL in AssociatorNames.");
-  if (!isGood(farEnd.path)) return operation.status;
-  const std::string systemName = sourceKey(operation, "SystemName");
-  std::vector<CMPIObjectPath*> paths;
-  if (farEnd.className == remoteServiceAccessPointClass) {
-    if (!passesResultClass(resultClass, remoteServiceAccessPointClass, "CIM_RemoteServiceAccessPoint")) {
+    if (!passesResultClass(operation.resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) {
       return operation.status;
     }
-    if (!fetchServers(operation, factory, farEnd.path, paths)) return operation.status;
-  } else if (farEnd.className == dnsProtocolEndPointClass) {
-    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) return operation.status;
-    if (!fetchEndpoints(operation, factory, farEnd.path, paths)) return operation.status;
+    if (!fetchEndpoints(operation, factory, farEnd.path, objects)) {
+      // The names do not log it.
+      if (kReturnsInstances<Found>) complain(operation, "getAllDNSClientCMPIInstances Failed");
+      return operation.status;
+    }
   }
-  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
-  for (CMPIObjectPath* path : counted16(paths)) {
-    if (keyText(path, "SystemName", &operation.status) != systemName) continue;
-    setNameSpaceAndHost(path, nameSpace);
-    returnObjectPath(result, path);
+  const std::string nameSpace = nameSpaceForPaths<Found>(operation);
+  for (Found* object : counted16(objects)) {
+    if (textIn(operation, object, "SystemName") == systemName) returnOnThisHost(operation, object, nameSpace);
   }
   return endWithoutDone(operation);
 }
@@ -169,73 +132,55 @@ static CMPIStatus DNSRemoteAccessAvailableToElement_AssociatorNames(CMPIAssociat
 static void setEnds(const CMPIInstance* reference, const FarEnd& farEnd, const CMPIObjectPath* source,
                     const CMPIObjectPath* target) {
   const bool farEndIsServer = farEnd.className == remoteServiceAccessPointClass;
-  setPair(reference, "Antecedent", farEndIsServer ? target : source, "Dependent", farEndIsServer ? source : target);
+  setPair(reference, remoteAccess, farEndIsServer ? target : source, farEndIsServer ? source : target);
 }
 
-// References and ReferenceNames have separate walks, because the first makes instances with keys only and takes their
-// paths. Neither filters: the source need not exist. Only the enumerations set OrderOfAccess.
+// The ends of References are instances with keys only, whose paths are taken; those of ReferenceNames are paths.
 
-static CMPIStatus DNSRemoteAccessAvailableToElement_References(CMPIAssociationMI*, const CMPIContext* context,
-                                                               const CMPIResult* result, const CMPIObjectPath* ref,
-                                                               const char*, const char*, const char**) {
-  Operation operation = ZV_OPERATION(loggerDNSRemoteAccess, context, result, ref);
-  DNSClientObjFactory factory;
-  const auto [farEnd, nameSpace, association] =
-      resolveReferences(operation, factory, remoteAccessAvailableToElementClass, newHostPath,
-                        remoteAccessAvailableToElementClass, "Object Path is NULL in References.");
-  if (!isGood(farEnd.path)) return operation.status;
-  std::vector<CMPIInstance*> keys;
+static bool fetchServerEnds(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
+                            std::vector<CMPIInstance*>& keys) {
+  keys.reserve(factory.getNumberOfDNSServerInstances());
+  return factory.getAllDNSServerCMPIInstances(broker, path, nullptr, true, keys, &operation.status) == 0;
+}
+static bool fetchServerEnds(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
+                            std::vector<CMPIObjectPath*>& paths) {
+  return fetchServers(operation, factory, path, paths);
+}
+
+static bool fetchEndpointEnds(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
+                              std::vector<CMPIInstance*>& keys) {
+  keys.reserve(factory.getNumberOfDNSClientInstances());
+  return factory.getAllDNSClientCMPIInstances(broker, path, nullptr, true, keys, &operation.status) == 0;
+}
+static bool fetchEndpointEnds(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
+                              std::vector<CMPIObjectPath*>& paths) {
+  return fetchEndpoints(operation, factory, path, paths);
+}
+
+// Nothing is filtered: the source need not exist. Only the builder sets OrderOfAccess.
+template <typename Found>
+static CMPIStatus refer(Operation& operation, DNSClientObjFactory& factory, const ReferenceParts& parts) {
+  const auto& [farEnd, nameSpace, association] = parts;
+  std::vector<Found*> ends;
   if (farEnd.className == remoteServiceAccessPointClass) {
-    keys.reserve(factory.getNumberOfDNSServerInstances());
-    if (factory.getAllDNSServerCMPIInstances(broker, farEnd.path, nullptr, true, keys, &operation.status) != 0) {
-      return fail(operation, "getAllDNSServerCMPIInstances Failed");
+    if (!fetchServerEnds(operation, factory, farEnd.path, ends)) {
+      return fail(operation,
+                  either<Found>("getAllDNSServerCMPIInstances Failed", "getAllDNSServerCMPIObjPaths Failed"));
     }
   } else if (farEnd.className == dnsProtocolEndPointClass) {
-    keys.reserve(factory.getNumberOfDNSClientInstances());
-    if (factory.getAllDNSClientCMPIInstances(broker, farEnd.path, nullptr, true, keys, &operation.status) != 0) {
-      return fail(operation, "getAllDNSClientCMPIInstances Failed");
+    if (!fetchEndpointEnds(operation, factory, farEnd.path, ends)) {
+      return fail(operation,
+                  either<Found>("getAllDNSClientCMPIInstances Failed", "getAllDNSClientCMPIObjPaths Failed"));
     }
   }
-  for (const CMPIInstance* key : counted16(keys)) {
+  for (Found* found : counted16(ends)) {
     const CMPIInstance* reference = newInstance(broker, association, &operation.status);
-    setEnds(reference, farEnd, ref, objectPathOf(key, &operation.status));
-    deliverInstance(operation, reference, nameSpace);
+    setEnds(reference, farEnd, operation.ref, pathOf(operation, found));
+    deliverOnThisHost<Found>(operation, reference, nameSpace);
   }
   return endWithoutDone(operation);
 }
-
-static CMPIStatus DNSRemoteAccessAvailableToElement_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
-                                                                   const CMPIResult* result, const CMPIObjectPath* ref,
-                                                                   const char*, const char*) {
-  Operation operation = ZV_OPERATION(loggerDNSRemoteAccess, context, result, ref);
-  DNSClientObjFactory factory;
-  const auto [farEnd, nameSpace, association] =
-      resolveReferences(operation, factory, remoteAccessAvailableToElementClass, newHostPath,
-                        remoteAccessAvailableToElementClass, "Object Path is NULL in ReferenceNames.");
-  if (!isGood(farEnd.path)) return operation.status;
-  std::vector<CMPIObjectPath*> paths;
-  if (farEnd.className == remoteServiceAccessPointClass) {
-    if (!fetchServers(operation, factory, farEnd.path, paths)) {
-      return fail(operation, "getAllDNSServerCMPIObjPaths Failed");
-    }
-  } else if (farEnd.className == dnsProtocolEndPointClass) {
-    if (!fetchEndpoints(operation, factory, farEnd.path, paths)) {
-      return fail(operation, "getAllDNSClientCMPIObjPaths Failed");
-    }
-  }
-  for (const CMPIObjectPath* path : counted16(paths)) {
-    const CMPIInstance* reference = newInstance(broker, association, &operation.status);
-    setEnds(reference, farEnd, ref, path);
-    deliverPathOnThisHost(operation, reference, nameSpace);
-  }
-  return endWithoutDone(operation);
-}
-
-ZV_REFUSED_INSTANCE_OPERATIONS(DNSRemoteAccessAvailableToElement)
-ZV_REFUSED_MODIFICATION(DNSRemoteAccessAvailableToElement)
-ZV_ASSOCIATION_CLEANUP(DNSRemoteAccessAvailableToElement)
 
 }  // namespace ZV
 
-ZV_INSTANCE_MI(DNSRemoteAccessAvailableToElementProvider, DNSRemoteAccessAvailableToElement)
-ZV_ASSOCIATION_MI(DNSRemoteAccessAvailableToElementProvider, DNSRemoteAccessAvailableToElement)
+ZV_ASSOCIATION_PROVIDER(DNSRemoteAccessAvailableToElementProvider, DNSRemoteAccessAvailableToElement, remoteAccess)

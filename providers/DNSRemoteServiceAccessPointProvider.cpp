@@ -10,58 +10,51 @@ static const std::string loggerDNSRemoteSAP = "Zorvagent.DNSRemoteServiceAccessP
 
 // A failure leaves the result open: no returnDone and no exit in the log. The status is what the broker's calls left.
 
-static CMPIStatus DNSRemoteServiceAccessPoint_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
-                                                                const CMPIResult* result, const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(loggerDNSRemoteSAP, context, result, ref);
+static CMPIStatus DNSRemoteServiceAccessPoint_EnumInstanceNames(Operation operation) {
+  operation = enter(operation, loggerDNSRemoteSAP);
   DNSClientObjFactory factory;
   std::vector<CMPIObjectPath*> paths;
-  if (!fetchServers(operation, factory, ref, paths)) return fail(operation, "getAllDNSServerCMPIObjPaths Failed");
-  for (const CMPIObjectPath* path : paths) returnObjectPath(result, path);
+  if (!fetchServers(operation, factory, operation.ref, paths))
+    return fail(operation, "getAllDNSServerCMPIObjPaths Failed");
+  for (const CMPIObjectPath* path : paths) returnOne(operation, path);
   return end(operation);
 }
 
-static CMPIStatus DNSRemoteServiceAccessPoint_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
-                                                            const CMPIResult* result, const CMPIObjectPath* ref,
-                                                            const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSRemoteSAP, context, result, ref);
+static CMPIStatus DNSRemoteServiceAccessPoint_EnumInstances(Operation operation) {
+  operation = enter(operation, loggerDNSRemoteSAP);
   DNSClientObjFactory factory;
   std::vector<CMPIInstance*> instances;
-  if (!fetchServers(operation, factory, ref, properties, instances)) {
+  if (!fetchServers(operation, factory, operation.ref, instances)) {
     return fail(operation, "getAllDNSServerCMPIInstances Failed");
   }
-  for (const CMPIInstance* instance : instances) returnInstance(result, instance);
+  for (const CMPIInstance* instance : instances) returnOne(operation, instance);
   return end(operation);
 }
 
-static CMPIStatus DNSRemoteServiceAccessPoint_GetInstance(CMPIInstanceMI*, const CMPIContext* context,
-                                                          const CMPIResult* result, const CMPIObjectPath* ref,
-                                                          const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSRemoteSAP, context, result, ref);
-  if (keyCountOf(ref, &operation.status) == 0) {
+static CMPIStatus DNSRemoteServiceAccessPoint_GetInstance(Operation operation) {
+  operation = enter(operation, loggerDNSRemoteSAP);
+  if (keyCountOf(operation.ref, &operation.status) == 0) {
     complain(operation, "At least one key should be passed");
     return end(operation);
   }
-  const CMPIString* name = stringOf(getKey(ref, "Name", &operation.status));
+  const CMPIString* name = stringOf(getKey(operation.ref, "Name", &operation.status));
   DNSClientObjFactory factory;
   std::vector<CMPIInstance*> instances;
   if (isGood(name)) {  // only the name decides; the other keys are ignored
-    if (factory.getOneDNSServerCMPIInstance(broker, ref, const_cast<CMPIString*>(name), properties, instances,
-                                            &operation.status) != 0) {
+    if (factory.getOneDNSServerCMPIInstance(broker, operation.ref, const_cast<CMPIString*>(name), operation.properties,
+                                            instances, &operation.status) != 0) {
       return fail(operation, "getOneDNSServerCMPIInstance Failed");
     }
-    for (const CMPIInstance* instance : instances) returnInstance(result, instance);
+    for (const CMPIInstance* instance : instances) returnOne(operation, instance);
   } else {  // all keys count, and every server has a name: nothing is found
-    if (!fetchServers(operation, factory, ref, properties, instances)) {
+    if (!fetchServers(operation, factory, operation.ref, instances)) {
       return fail(operation, "getAllDNSServerCMPIInstances Failed");
     }
-    returnFirstEqual(result, ref, instances, false, &operation.status);
+    returnFirstEqual(operation, instances, false);
   }
   return end(operation);
 }
 
-ZV_REFUSED_INSTANCE_OPERATIONS(DNSRemoteServiceAccessPoint)
-ZV_REFUSED_MODIFICATION(DNSRemoteServiceAccessPoint)
-
 }  // namespace ZV
 
-ZV_INSTANCE_MI(DNSRemoteServiceAccessPointProvider, DNSRemoteServiceAccessPoint)
+ZV_INSTANCE_MI(DNSRemoteServiceAccessPointProvider, DNSRemoteServiceAccessPoint, refusedModification)

@@ -8,14 +8,18 @@
 #include "factory/DNSClientObjFactory.h"
 #include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"
-#include "providers/Results.h"
 
 namespace ZV {
 
-static const std::string loggerDNSSAPDependency = "Zorvagent.DNSSAPSAPDependencyProvider";
 static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
-static const char* const dnsSAPSAPDependencyClass = "ZORVA_DNSSAPSAPDependency";
 static const char* const ipInterfaceClass = "ZORVA_IPProtocolEndpoint";
+static const Association sapDependency = {"Zorvagent.DNSSAPSAPDependencyProvider",
+                                          "ZORVA_DNSSAPSAPDependency",
+                                          "Antecedent",
+                                          "Dependent",
+                                          newHostPath,
+                                          "ZORVA_DNSSAPSAPDependency",
+                                          kNamesEachOperation};
 
 namespace {
 
@@ -29,157 +33,113 @@ bool firstTokenEquals(const std::string& ipName, const std::string& dnsName) {
 // Finds the DNS endpoint with an IP endpoint's whole name: null if the path has no name or no endpoint has it. False,
 // with an error, if the look-up fails.
 bool findEndpoint(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* ipEndpoint, bool isObjPath,
-                  const char** properties, CMPIInstance*& endpoint, const Place& place = Place::here()) {
+                  CMPIInstance*& endpoint, const Place& place = Place::here()) {
   endpoint = nullptr;
   const CMPIString* name = stringOf(getKey(ipEndpoint, "Name", &operation.status));
   if (!isGood(name)) return true;
   return factory.getDNSClientCMPIInstanceFromIPInterface(broker, operation.ref, textOf(name, &operation.status),
-                                                         endpoint, isObjPath, properties, &operation.status) == 0 ||
+                                                         endpoint, isObjPath, operation.properties,
+                                                         &operation.status) == 0 ||
          complain(operation, "getDNSClientCMPIInstanceFromIPInterface Failed", place);
 }
 
 }  // namespace
 
-static unsigned short DNSSAPSAPDependencyCMPIInstances(const CMPIContext* context, const CMPIObjectPath* ref,
-                                                       const char** properties, std::vector<CMPIInstance*>& instances) {
-  Operation operation = ZV_OPERATION(loggerDNSSAPDependency, context, nullptr, ref);
+static unsigned short DNSSAPSAPDependencyCMPIInstances(Operation operation, std::vector<CMPIInstance*>& instances) {
+  operation = enter(operation, sapDependency.category);
   DNSClientObjFactory factory;
-  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
   const CMPIEnumeration* ipEndpoints = nullptr;
-  if (!askForNames(operation, nameSpace, ipInterfaceClass, "Create CMPIObjectPath failed for IpInterfaceClass.",
-                   ipEndpoints)) {
+  if (!askForAll<CMPIObjectPath>(operation, nameSpace, ipInterfaceClass,
+                                 "Create CMPIObjectPath failed for IpInterfaceClass.", ipEndpoints)) {
     return 1;
   }
   while (hasNext(ipEndpoints, &operation.status)) {
     const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &operation.status);
     CMPIInstance* endpoint = nullptr;
-    if (!findEndpoint(operation, factory, ipEndpoint, false, properties, endpoint)) return 1;
+    if (!findEndpoint(operation, factory, ipEndpoint, false, endpoint)) return 1;
     if (!isGood(endpoint)) continue;
     CMPIObjectPath* endpointPath = objectPathOf(endpoint, &operation.status);
     if (isMissing(operation, endpointPath, "CMPIObjectPath is NULL for DNS Client")) return 1;
     setNameSpaceAndHost(endpointPath, nameSpace);
-    CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsSAPSAPDependencyClass, &operation.status);
+    CMPIObjectPath* path = newHostPath(broker, nameSpace, sapDependency.className, &operation.status);
     if (isMissing(operation, path, "Create CMPIObjectPath failed for \t\t\t\tDNSSAPSAPDependency.")) return 1;
     CMPIInstance* instance = newInstance(broker, path, &operation.status);
     if (!isGood(instance)) continue;
-    setPropertyFilter(instance, properties, {"Antecedent", "Dependent"});
-    setPair(instance, "Antecedent", ipEndpoint, "Dependent", endpointPath);
+    setPropertyFilter(instance, operation.properties, {"Antecedent", "Dependent"});
+    setPair(instance, sapDependency, ipEndpoint, endpointPath);
     instances.push_back(instance);
   }
   markExit(operation);
   return 0;
 }
 
+ZV_BUILT_INSTANCES(DNSSAPSAPDependency, sapDependency, DNSSAPSAPDependencyCMPIInstances)
+
 // Returns each path at once: after a later failure these paths are already delivered, and the result stays open.
-static CMPIStatus DNSSAPSAPDependency_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
-                                                        const CMPIResult* result, const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(loggerDNSSAPDependency, context, result, ref);
+static CMPIStatus DNSSAPSAPDependency_EnumInstanceNames(Operation operation) {
+  operation = enter(operation, sapDependency.category);
   DNSClientObjFactory factory;
-  const std::string nameSpace = nameSpaceOf(ref, &operation.status);
+  const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
   const CMPIEnumeration* ipEndpoints = nullptr;
-  if (!askForNames(operation, nameSpace, ipInterfaceClass, "Create CMPIObjectPath failed for IpInterfaceClass.",
-                   ipEndpoints)) {
+  if (!askForAll<CMPIObjectPath>(operation, nameSpace, ipInterfaceClass,
+                                 "Create CMPIObjectPath failed for IpInterfaceClass.", ipEndpoints)) {
     return operation.status;
   }
   while (hasNext(ipEndpoints, &operation.status)) {
     const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &operation.status);
     CMPIInstance* endpoint = nullptr;
-    if (!findEndpoint(operation, factory, ipEndpoint, true, nullptr, endpoint)) return operation.status;
+    if (!findEndpoint(operation, factory, ipEndpoint, true, endpoint)) return operation.status;
     if (!isGood(endpoint)) continue;
     CMPIObjectPath* endpointPath = objectPathOf(endpoint, &operation.status);
     if (isMissing(operation, endpointPath, "CMPIObjectPath is NULL for DNS Client")) return operation.status;
     setNameSpaceAndHost(endpointPath, nameSpace);
-    CMPIObjectPath* path = newHostPath(broker, nameSpace, dnsSAPSAPDependencyClass, &operation.status);
-    if (isMissing(operation, path, "Create CMPIObjectPath failed for \t\t\t\tdnsSAPSAPDependencyClass.")) {
+    if (!returnPair(operation, sapDependency, nameSpace,
+                    "Create CMPIObjectPath failed for \t\t\t\tdnsSAPSAPDependencyClass.", ipEndpoint, endpointPath)) {
       return operation.status;
     }
-    returnPairPath(operation, path, "Antecedent", ipEndpoint, "Dependent", endpointPath);
   }
-  return end(operation);
-}
-
-static CMPIStatus DNSSAPSAPDependency_EnumInstances(CMPIInstanceMI*, const CMPIContext* context,
-                                                    const CMPIResult* result, const CMPIObjectPath* ref,
-                                                    const char** properties) {
-  const Operation operation = ZV_OPERATION(loggerDNSSAPDependency, context, result, ref);
-  returnBuilt(operation, DNSSAPSAPDependencyCMPIInstances, properties);
-  return end(operation);
-}
-
-static CMPIStatus DNSSAPSAPDependency_GetInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
-                                                  const CMPIObjectPath* ref, const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSSAPDependency, context, result, ref);
-  returnEqualBuilt(operation, DNSSAPSAPDependencyCMPIInstances, properties);
   return end(operation);
 }
 
 // The four operations below never call returnDone.
 
-static CMPIStatus DNSSAPSAPDependency_Associators(CMPIAssociationMI*, const CMPIContext* context,
-                                                  const CMPIResult* result, const CMPIObjectPath* ref,
-                                                  const char* assocClass, const char* resultClass, const char*,
-                                                  const char*, const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSSAPDependency, context, result, ref);
-  DNSClientObjFactory factory;
-  const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsSAPSAPDependencyClass),
-                                      resultClass, "Object Path is NULL in Associators.");
-  if (!isGood(farEnd.path)) return operation.status;
+template <typename Found>
+static CMPIStatus associate(Operation& operation, DNSClientObjFactory& factory, const FarEnd& farEnd) {
   if (farEnd.className == ipInterfaceClass) {
-    if (!passesResultClass(resultClass, ipInterfaceClass, "CIM_IPProtocolEndPoint")) return operation.status;
+    if (!passesResultClass(operation.resultClass, ipInterfaceClass, "CIM_IPProtocolEndPoint")) return operation.status;
     const std::string name = sourceKey(operation, "Name");
     const CMPIEnumeration* ipEndpoints = nullptr;
-    if (!askForInstances(operation, farEnd.path, "Call to CBEnumInstances of target Class Failed.", ipEndpoints)) {
+    if (!askFor<Found>(operation, farEnd.path, ipEndpoints,
+                       either<Found>("Call to CBEnumInstances of target Class Failed.",
+                                     "CBEnumInstanceNames Failed for the target Class"))) {
       return operation.status;
     }
     while (hasNext(ipEndpoints, &operation.status)) {
-      const CMPIInstance* ipEndpoint = nextInstance(ipEndpoints, &operation.status);
-      if (!firstTokenEquals(propertyText(ipEndpoint, "Name", &operation.status), name)) continue;
-      returnInstance(result, ipEndpoint);
+      Found* ipEndpoint = next<Found>(operation, ipEndpoints);
+      if (!firstTokenEquals(textIn(operation, ipEndpoint, "Name"), name)) continue;
+      returnOne(operation, ipEndpoint);
       break;  // only the first match; the references return all
     }
   } else if (farEnd.className == dnsProtocolEndPointClass) {
-    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) return operation.status;
-    CMPIInstance* endpoint = nullptr;
-    if (!findEndpoint(operation, factory, ref, false, properties, endpoint)) return operation.status;
-    if (endpoint != nullptr) returnInstance(result, endpoint);
-  }
-  return endWithoutDone(operation);
-}
-
-static CMPIStatus DNSSAPSAPDependency_AssociatorNames(CMPIAssociationMI*, const CMPIContext* context,
-                                                      const CMPIResult* result, const CMPIObjectPath* ref,
-                                                      const char* assocClass, const char* resultClass, const char*,
-                                                      const char*) {
-  Operation operation = ZV_OPERATION(loggerDNSSAPDependency, context, result, ref);
-  DNSClientObjFactory factory;
-  const FarEnd farEnd = resolveFarEnd(operation, factory, associationOr(assocClass, dnsSAPSAPDependencyClass),
-                                      resultClass, "Object Path is NULL in AssociatorNames.");
-  if (!isGood(farEnd.path)) return operation.status;
-  if (farEnd.className == ipInterfaceClass) {
-    if (!passesResultClass(resultClass, ipInterfaceClass, "CIM_IPProtocolEndPoint")) return operation.status;
-    const std::string name = sourceKey(operation, "Name");
-    const CMPIEnumeration* ipEndpoints = nullptr;
-    if (!askForNames(operation, farEnd.path, ipEndpoints)) return operation.status;
-    while (hasNext(ipEndpoints, &operation.status)) {
-      const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &operation.status);
-      if (!firstTokenEquals(keyText(ipEndpoint, "Name", &operation.status), name)) continue;
-      returnObjectPath(result, ipEndpoint);
-      break;
+    if (!passesResultClass(operation.resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) {
+      return operation.status;
     }
-  } else if (farEnd.className == dnsProtocolEndPointClass) {
-    if (!passesResultClass(resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) return operation.status;
     CMPIInstance* endpoint = nullptr;
-    if (!findEndpoint(operation, factory, ref, true, nullptr, endpoint)) return operation.status;
-    if (endpoint != nullptr) returnObjectPath(result, objectPathOf(endpoint, &operation.status));
+    if (!findEndpoint(operation, factory, operation.ref, !kReturnsInstances<Found>, endpoint)) return operation.status;
+    if (endpoint == nullptr) return endWithoutDone(operation);
+    if constexpr (kReturnsInstances<Found>) {
+      returnOne(operation, endpoint);
+    } else {
+      returnOne(operation, objectPathOf(endpoint, &operation.status));
+    }
   }
   return endWithoutDone(operation);
 }
 
-static CMPIStatus refer(Operation operation, const char* noFarEnd, Deliver deliver) {
-  DNSClientObjFactory factory;
-  const auto [farEnd, nameSpace, association] =
-      resolveReferences(operation, factory, dnsSAPSAPDependencyClass, newHostPath, dnsSAPSAPDependencyClass, noFarEnd);
-  if (!isGood(farEnd.path)) return operation.status;
+template <typename Found>
+static CMPIStatus refer(Operation& operation, DNSClientObjFactory& factory, const ReferenceParts& parts) {
+  const auto& [farEnd, nameSpace, association] = parts;
   if (farEnd.className == dnsProtocolEndPointClass) {
     std::vector<CMPIObjectPath*> endpoints;
     if (!fetchEndpoints(operation, factory, farEnd.path, endpoints)) {
@@ -188,45 +148,25 @@ static CMPIStatus refer(Operation operation, const char* noFarEnd, Deliver deliv
     for (CMPIObjectPath* endpoint : counted16(endpoints)) {
       const std::string sourceName = sourceKey(operation, "Name");
       if (!firstTokenEquals(sourceName, keyText(endpoint, "Name", &operation.status))) continue;
-      CMPIInstance* reference = newInstance(broker, association, &operation.status);
+      const CMPIInstance* reference = newInstance(broker, association, &operation.status);
       setNameSpaceAndHost(endpoint, nameSpace);
-      setPair(reference, "Antecedent", operation.ref, "Dependent", endpoint);
-      deliver(operation, reference, nameSpace);
+      setPair(reference, sapDependency, operation.ref, endpoint);
+      deliverOnThisHost<Found>(operation, reference, nameSpace);
     }
   } else if (farEnd.className == ipInterfaceClass) {
     const CMPIEnumeration* ipEndpoints = nullptr;
-    if (!askForNames(operation, farEnd.path, ipEndpoints)) return operation.status;
+    if (!askFor<CMPIObjectPath>(operation, farEnd.path, ipEndpoints)) return operation.status;
     while (hasNext(ipEndpoints, &operation.status)) {
       const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &operation.status);
       const std::string ipName = keyText(ipEndpoint, "Name", &operation.status);
       if (!firstTokenEquals(ipName, sourceKey(operation, "Name"))) continue;
-      const CMPIInstance* reference =
-          newPair(operation, association, "Antecedent", ipEndpoint, "Dependent", operation.ref);
-      deliver(operation, reference, nameSpace);
+      const CMPIInstance* reference = newPair(operation, sapDependency, association, ipEndpoint, operation.ref);
+      deliverOnThisHost<Found>(operation, reference, nameSpace);
     }
   }
   return endWithoutDone(operation);
 }
 
-static CMPIStatus DNSSAPSAPDependency_References(CMPIAssociationMI*, const CMPIContext* context,
-                                                 const CMPIResult* result, const CMPIObjectPath* ref, const char*,
-                                                 const char*, const char**) {
-  return refer(ZV_OPERATION(loggerDNSSAPDependency, context, result, ref), "Object Path is NULL in References.",
-               deliverInstance);
-}
-
-static CMPIStatus DNSSAPSAPDependency_ReferenceNames(CMPIAssociationMI*, const CMPIContext* context,
-                                                     const CMPIResult* result, const CMPIObjectPath* ref, const char*,
-                                                     const char*) {
-  return refer(ZV_OPERATION(loggerDNSSAPDependency, context, result, ref), "Object Path is NULL in ReferenceNames.",
-               deliverPathOnThisHost);
-}
-
-ZV_REFUSED_INSTANCE_OPERATIONS(DNSSAPSAPDependency)
-ZV_REFUSED_MODIFICATION(DNSSAPSAPDependency)
-ZV_ASSOCIATION_CLEANUP(DNSSAPSAPDependency)
-
 }  // namespace ZV
 
-ZV_INSTANCE_MI(DNSSAPSAPDependencyProvider, DNSSAPSAPDependency)
-ZV_ASSOCIATION_MI(DNSSAPSAPDependencyProvider, DNSSAPSAPDependency)
+ZV_ASSOCIATION_PROVIDER(DNSSAPSAPDependencyProvider, DNSSAPSAPDependency, sapDependency)

@@ -11,54 +11,42 @@ static const std::string loggerDNSSettingDataProv = "Zorvagent.DNSSettingDataPro
 
 // A failure leaves the result open: no returnDone and no exit in the log. The status is what the broker's calls left.
 
-static CMPIStatus DNSSettingData_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* context,
-                                                   const CMPIResult* result, const CMPIObjectPath* ref) {
-  Operation operation = ZV_OPERATION(loggerDNSSettingDataProv, context, result, ref);
+static CMPIStatus DNSSettingData_EnumInstanceNames(Operation operation) {
+  operation = enter(operation, loggerDNSSettingDataProv);
   std::vector<CMPIObjectPath*> paths;
-  if (getAllDNSSettingDataCMPIObjectPaths(broker, ref, &paths, &operation.status) != 0) {
+  if (getAllDNSSettingDataCMPIObjectPaths(broker, operation.ref, &paths, &operation.status) != 0) {
     return fail(operation, "getAllDNSSettingDataCMPIInstances Failed");
   }
-  returnAll(result, paths);
+  returnAll(operation, paths);
   return end(operation);
 }
 
-static CMPIStatus DNSSettingData_EnumInstances(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
-                                               const CMPIObjectPath* ref, const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSSettingDataProv, context, result, ref);
+static CMPIStatus DNSSettingData_EnumInstances(Operation operation) {
+  operation = enter(operation, loggerDNSSettingDataProv);
   std::vector<CMPIInstance*> instances;
-  if (getAllDNSSettingDataCMPIInstances(broker, ref, properties, &instances, &operation.status) != 0) {
-    return fail(operation, "getAllDNSSettingDataCMPIInstances Failed");
-  }
-  returnAll(result, instances);
+  if (!fetchSettings(operation, operation.ref, instances)) return operation.status;
+  returnAll(operation, instances);
   return end(operation);
 }
 
-static CMPIStatus DNSSettingData_GetInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
-                                             const CMPIObjectPath* ref, const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSSettingDataProv, context, result, ref);
+static CMPIStatus DNSSettingData_GetInstance(Operation operation) {
+  operation = enter(operation, loggerDNSSettingDataProv);
   CMPIInstance* instance = nullptr;
-  if (getOneDNSSettingDataCMPIInstance(broker, ref, properties, &instance, &operation.status) != 0) {
+  if (getOneDNSSettingDataCMPIInstance(broker, operation.ref, operation.properties, &instance, &operation.status) !=
+      0) {
     return fail(operation, "getOneDNSSettingDataCMPIInstance Failed");
   }
-  returnInstance(result, instance);
+  returnOne(operation, instance);
   return end(operation);
 }
 
-static CMPIStatus DNSSettingData_ModifyInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
-                                                const CMPIObjectPath* ref, const CMPIInstance* instance,
-                                                const char** properties) {
-  Operation operation = ZV_OPERATION(loggerDNSSettingDataProv, context, result, ref);
-  const unsigned int rc = modifyDNSSettingDataCMPIInstance(broker, ref, properties, instance, &operation.status);
-  if (rc != CMPI_RC_OK) {
-    complain(operation, "modifyDNSSettingDataCMPIInstance Failed");
-    operation.status.rc = static_cast<CMPIrc>(rc);
-  }
-  returnDone(result);
-  return {operation.status.rc, nullptr};  // no exit is logged
+static CMPIStatus DNSSettingData_ModifyInstance(Operation operation, const CMPIInstance* changed) {
+  operation = enter(operation, loggerDNSSettingDataProv);
+  const unsigned int rc =
+      modifyDNSSettingDataCMPIInstance(broker, operation.ref, operation.properties, changed, &operation.status);
+  return endModification(operation, rc);
 }
-
-ZV_REFUSED_INSTANCE_OPERATIONS(DNSSettingData)
 
 }  // namespace ZV
 
-ZV_INSTANCE_MI(DNSSettingDataProvider, DNSSettingData)
+ZV_INSTANCE_MI(DNSSettingDataProvider, DNSSettingData, modifyInstance<DNSSettingData_ModifyInstance>)

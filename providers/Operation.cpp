@@ -6,13 +6,20 @@ static LogSite siteOf(const Operation& operation, const Place& place) {
   return {operation.name, place.file, place.line};
 }
 
-Operation enter(const Operation& operation, const Place& place) {
-  markProviderEntry(operation.category, operation.name, place.file, place.line);
+Operation named(Operation operation, const std::string& category, const char* name) {
+  operation.category = &category;
+  operation.name = name;
+  operation.status = kStatusOk;
   return operation;
 }
 
+Operation enter(Operation operation, const std::string& category, const char* name, const Place& place) {
+  markProviderEntry(category, name, place.file, place.line);
+  return named(operation, category, name);
+}
+
 bool complain(const Operation& operation, const char* text, const Place& place) {
-  logError(operation.category, siteOf(operation, place), text);
+  logError(*operation.category, siteOf(operation, place), text);
   return false;
 }
 
@@ -22,11 +29,11 @@ CMPIStatus fail(const Operation& operation, const char* text, const Place& place
 }
 
 void logValue(const Operation& operation, const char* name, const std::string& value, const Place& place) {
-  logVariable(operation.category, siteOf(operation, place), name, value);
+  logVariable(*operation.category, siteOf(operation, place), name, value);
 }
 
 void markExit(const Operation& operation, const Place& place) {
-  markProviderExit(operation.category, operation.name, place.file, place.line);
+  markProviderExit(*operation.category, operation.name, place.file, place.line);
 }
 
 CMPIStatus end(const Operation& operation, const Place& place) {

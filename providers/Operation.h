@@ -13,24 +13,25 @@
 namespace ZV {
 
 struct Operation {
-  const CMPIBroker* broker;
-  const std::string& category;  ///< of its log lines
-  const char* name;
-  const CMPIContext* context;
-  const CMPIResult* result;
-  const CMPIObjectPath* ref;
-  CMPIStatus status;
+  const CMPIBroker* broker = nullptr;
+  const CMPIContext* context = nullptr;
+  const CMPIResult* result = nullptr;
+  const CMPIObjectPath* ref = nullptr;
+  const char** properties = nullptr;  ///< of the instances to return; null for all, and if the client asks for names
+  const char* assocClass = nullptr;   ///< of a request for associators; null if it names none
+  const char* resultClass = nullptr;  ///< likewise
+  const char* name = nullptr;         ///< of its log lines
+  const std::string* category = nullptr;
+  CMPIStatus status = kStatusOk;
 };
 
-/// The operation of the function that uses the macro, with the broker of its source. The first one logs the entry; the
-/// second is for functions that write their own entry line.
-#define ZV_OPERATION(logger, context, result, ref) (::ZV::enter(ZV_UNMARKED_OPERATION(logger, context, result, ref)))
-#define ZV_UNMARKED_OPERATION(logger, context, result, ref) \
-  (::ZV::Operation{::ZV::broker, logger, static_cast<const char*>(__func__), context, result, ref, ::ZV::kStatusOk})
+/// The operation with the name of the calling function, that category and a status of its own. The second one also logs
+/// the entry.
+Operation named(Operation operation, const std::string& category, const char* name = __builtin_FUNCTION());
+Operation enter(Operation operation, const std::string& category, const char* name = __builtin_FUNCTION(),
+                const Place& place = Place::here());
 
 // Each line has the operation's name and the place of the calling statement.
-
-Operation enter(const Operation& operation, const Place& place = Place::here());
 
 /// Writes an error; always false, for a step that ends with it.
 bool complain(const Operation& operation, const char* text, const Place& place = Place::here());

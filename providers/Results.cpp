@@ -3,6 +3,8 @@
 #include <ObjectPaths.h>
 
 #include "factory/CmpiSupport.h"
+#include "factory/DNSGeneralSettingDataObjects.h"
+#include "factory/DNSSettingDataObjects.h"
 
 namespace ZV {
 
@@ -13,9 +15,9 @@ bool fetchEndpoints(Operation& operation, DNSClientObjFactory& factory, const CM
 }
 
 bool fetchEndpoints(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                    const char** properties, std::vector<CMPIInstance*>& endpoints) {
+                    std::vector<CMPIInstance*>& endpoints) {
   endpoints.reserve(factory.getNumberOfDNSClientInstances());
-  return factory.getAllDNSClientCMPIInstances(operation.broker, path, properties, false, endpoints,
+  return factory.getAllDNSClientCMPIInstances(operation.broker, path, operation.properties, false, endpoints,
                                               &operation.status) == 0;
 }
 
@@ -26,31 +28,60 @@ bool fetchServers(Operation& operation, DNSClientObjFactory& factory, const CMPI
 }
 
 bool fetchServers(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                  const char** properties, std::vector<CMPIInstance*>& servers) {
+                  std::vector<CMPIInstance*>& servers) {
   servers.reserve(factory.getNumberOfDNSServerInstances());
-  return factory.getAllDNSServerCMPIInstances(operation.broker, path, properties, false, servers, &operation.status) ==
-         0;
+  return factory.getAllDNSServerCMPIInstances(operation.broker, path, operation.properties, false, servers,
+                                              &operation.status) == 0;
 }
 
-void returnAll(const CMPIResult* result, const std::vector<CMPIInstance*>& instances) {
-  for (const CMPIInstance* instance : counted16(instances)) returnInstance(result, instance);
+bool fetchSettings(Operation& operation, const CMPIObjectPath* path, std::vector<CMPIObjectPath*>& settings,
+                   const Place& place) {
+  return getAllDNSSettingDataCMPIObjectPaths(operation.broker, path, &settings, &operation.status) == 0 ||
+         complain(operation, "getAllDNSSettingDataCMPIObjectPaths Failed", place);
 }
 
-void returnAll(const CMPIResult* result, const std::vector<CMPIObjectPath*>& paths) {
-  for (const CMPIObjectPath* path : counted16(paths)) returnObjectPath(result, path);
+bool fetchSettings(Operation& operation, const CMPIObjectPath* path, std::vector<CMPIInstance*>& settings,
+                   const Place& place) {
+  return getAllDNSSettingDataCMPIInstances(operation.broker, path, operation.properties, &settings,
+                                           &operation.status) == 0 ||
+         complain(operation, "getAllDNSSettingDataCMPIInstances Failed", place);
 }
 
-void returnPathsOf(const CMPIResult* result, const std::vector<CMPIInstance*>& instances, CMPIStatus* status) {
-  for (const CMPIInstance* instance : counted16(instances)) returnObjectPath(result, objectPathOf(instance, status));
+bool fetchGeneralSettings(Operation& operation, const CMPIObjectPath* path, std::vector<CMPIObjectPath*>& settings,
+                          const Place& place) {
+  return getAllDNSGeneralSettingDataCMPIObjectPaths(operation.broker, path, &settings, &operation.status) == 0 ||
+         complain(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed", place);
 }
 
-void returnFirstEqual(const CMPIResult* result, const CMPIObjectPath* ref, const std::vector<CMPIInstance*>& instances,
-                      bool keysAreReferences, CMPIStatus* status) {
+bool fetchGeneralSettings(Operation& operation, const CMPIObjectPath* path, std::vector<CMPIInstance*>& settings,
+                          const Place& place) {
+  return getAllDNSGeneralSettingDataCMPIInstances(operation.broker, path, operation.properties, &settings,
+                                                  &operation.status) == 0 ||
+         complain(operation, "getAllDNSGeneralSettingDataCMPIInstances Failed", place);
+}
+
+void returnPathsOf(Operation& operation, const std::vector<CMPIInstance*>& instances) {
   for (const CMPIInstance* instance : counted16(instances)) {
-    if (!isGood(instance) || !isObjPathsEqual(ref, objectPathOf(instance, status), keysAreReferences)) continue;
-    returnInstance(result, instance);
+    returnOne(operation, objectPathOf(instance, &operation.status));
+  }
+}
+
+void returnFirstEqual(Operation& operation, const std::vector<CMPIInstance*>& instances, bool keysAreReferences) {
+  for (const CMPIInstance* instance : counted16(instances)) {
+    if (!isGood(instance)) continue;
+    if (!isObjPathsEqual(operation.ref, objectPathOf(instance, &operation.status), keysAreReferences)) continue;
+    returnOne(operation, instance);
     return;
   }
+}
+
+CMPIStatus endModification(Operation& operation, unsigned int rc, const Place& place) {
+  if (rc != CMPI_RC_OK) {
+    complain(operation, "modifyDNSSettingDataCMPIInstance Failed", place);
+    operation.status.rc = static_cast<CMPIrc>(rc);
+  }
+  returnDone(operation.result);
+  return {operation.status.rc, nullptr};
 }
 
 }  // namespace ZV
