@@ -2,27 +2,12 @@
 
 #include <cstring>
 
+#include "factory/ClassNames.h"
 #include "factory/CmpiSupport.h"
 #include "factory/DNSClientObjFactory.h"
 #include "trace/Trace.h"
 
 namespace ZV {
-
-static const char* const computerSystemClass = "ZORVA_ComputerSystem";
-static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
-static const char* const dnsSettingDataClass = "ZORVA_DNSSettingData";
-static const char* const dnsGeneralSettingDataClass = "ZORVA_DNSGeneralSettingData";
-static const char* const remoteServiceAccessPointClass = "ZORVA_RemoteServiceAccessPoint";
-static const char* const remoteAccessAvailableToElementClass = "ZORVA_RemoteAccessAvailableToElement";
-static const char* const dnsSAPSAPDependencyClass = "ZORVA_DNSSAPSAPDependency";
-static const char* const ipInterfaceClass = "ZORVA_IPProtocolEndpoint";
-static const char* const dnsHostedAccessPointClass = "ZORVA_DNSHostedAccessPoint";
-static const char* const dnsGeneralElementSettingDataClass = "ZORVA_DNSGeneralElementSettingData";
-static const char* const dnsEndpointElementSettingDataClass = "ZORVA_DNSEndPointElementSettingData";
-static const char* const dnsGenEndpointElementSettingDataClass = "ZORVA_DNSGenEndPointElementSettingData";
-static const char* const dnsGenOrderedComponentClass = "ZORVA_DNSGenOrderedComponent";
-static const char* const dnsOrderedComponentClass = "ZORVA_DNSOrderedComponent";
-static const char* const ipAssignmentSettingDataClass = "ZORVA_IPAssignmentSettingData";
 
 namespace {
 

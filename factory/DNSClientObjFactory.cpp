@@ -5,6 +5,7 @@
 #include <StringConversion.h>
 #include <strings.h>
 
+#include "factory/ClassNames.h"
 #include "factory/CmpiSupport.h"
 #include "factory/SettingProperties.h"
 #include "trace/Trace.h"
@@ -12,9 +13,6 @@
 namespace ZV {
 
 const std::string loggerDNSObjFactory = "Zorvagent.DNSObjFactory";
-static const char* const computerSystemClass = "ZORVA_ComputerSystem";
-static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
-static const char* const remoteServiceAccessPointClass = "ZORVA_RemoteServiceAccessPoint";
 
 namespace {
 

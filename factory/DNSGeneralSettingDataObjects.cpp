@@ -2,14 +2,13 @@
 
 #include <PlatformUtilities.h>
 
+#include "factory/ClassNames.h"
 #include "factory/CmpiSupport.h"
 #include "factory/DNSClientObjFactory.h"
 #include "factory/SettingProperties.h"
 #include "trace/Trace.h"
 
 namespace ZV {
-
-static const char* const dnsGeneralSettingDataClass = "ZORVA_DNSGeneralSettingData";
 
 namespace {
 

@@ -1,13 +1,12 @@
 #include "factory/DNSSettingDataObjects.h"
 
+#include "factory/ClassNames.h"
 #include "factory/CmpiSupport.h"
 #include "factory/DNSClientObjFactory.h"
 #include "factory/SettingProperties.h"
 #include "trace/Trace.h"
 
 namespace ZV {
-
-static const char* const dnsSettingDataClass = "ZORVA_DNSSettingData";
 
 unsigned short getAllDNSSettingDataCMPIObjectPaths(const CMPIBroker* broker, const CMPIObjectPath* ref,
                                                    std::vector<CMPIObjectPath*>* paths, CMPIStatus* status) {

@@ -40,7 +40,7 @@ CMPIStatus referWith(Refer walk, Operation operation, const Association& associa
   parts.farEnd.path = factory.get_assoc_targetClass_ObjectPath(operation.broker, operation.ref, association.className,
                                                                nullptr, &operation.status);
   parts.nameSpace = nameSpaceOf(operation.ref, &operation.status);
-  parts.association = association.makePath(operation.broker, parts.nameSpace, madeClass, &operation.status);
+  parts.association = association.family.makePath(operation.broker, parts.nameSpace, madeClass, &operation.status);
   if (isMissing(operation, parts.farEnd.path, noFarEnd, place)) return operation.status;
   parts.farEnd.className = classNameOf(parts.farEnd.path, &operation.status);
   return walk(operation, factory, parts);
@@ -56,8 +56,9 @@ std::string sourceKey(Operation& operation, const char* name) {
 
 void setPair(const CMPIInstance* instance, const Association& association, const CMPIObjectPath* first,
              const CMPIObjectPath* second) {
-  setReference(instance, association.firstName, first);
-  setReference(instance, association.secondName, second);
+  setReference(instance, association.references.first, first);
+  setReference(instance, association.references.second, second);
+  if (association.setOthers != nullptr) association.setOthers(instance);
 }
 
 CMPIInstance* newPair(Operation& operation, const Association& association, const CMPIObjectPath* path,
@@ -67,12 +68,19 @@ CMPIInstance* newPair(Operation& operation, const Association& association, cons
   return pair;
 }
 
-bool newBuilt(Operation& operation, const Association& association, const std::string& nameSpace, const char* noPath,
-              CMPIInstance*& instance, const Place& place) {
+bool addBuilt(Operation& operation, const Association& association, const std::string& nameSpace, const char* noPath,
+              const CMPIObjectPath* first, const CMPIObjectPath* second, std::vector<CMPIInstance*>& instances,
+              const char* notMade, const Place& place) {
   const CMPIObjectPath* path = newHostPath(operation.broker, nameSpace, association.className, &operation.status);
   if (isMissing(operation, path, noPath, place)) return false;
-  instance = newInstance(operation.broker, path, nullptr);
-  setPropertyFilter(instance, operation.properties, {association.firstName, association.secondName});
+  CMPIInstance* instance = newInstance(operation.broker, path, nullptr);
+  if (!isGood(instance)) {
+    if (notMade != nullptr) complain(operation, notMade, place);
+    return true;
+  }
+  setPropertyFilter(instance, operation.properties, {association.references.first, association.references.second});
+  setPair(instance, association, first, second);
+  instances.push_back(instance);
   return true;
 }
 
@@ -80,8 +88,8 @@ bool returnPair(Operation& operation, const Association& association, const std:
                 const CMPIObjectPath* first, const CMPIObjectPath* second, const Place& place) {
   CMPIObjectPath* path = newHostPath(operation.broker, nameSpace, association.className, &operation.status);
   if (isMissing(operation, path, noPath, place)) return false;
-  addReferenceKey(path, association.firstName, first);
-  addReferenceKey(path, association.secondName, second);
+  addReferenceKey(path, association.references.first, first);
+  addReferenceKey(path, association.references.second, second);
   returnOne(operation, path);
   return true;
 }
@@ -91,8 +99,7 @@ unsigned short failBuilder(const Operation& operation, const char* text, const P
   return 1;
 }
 
-unsigned short failAndLeaveBuilder(const Operation& operation, const char* text, const Place& place) {
-  complain(operation, text, place);
+unsigned short leaveBuilder(const Operation& operation, const Place& place) {
   markExit(operation, place);
   return 1;
 }

@@ -2,6 +2,7 @@
 
 // The steps that the eight association providers share. Each provider's source contains its own walks, made of these.
 
+#include <optional>
 #include <string>
 #include <type_traits>
 #include <vector>
@@ -28,15 +29,31 @@ constexpr NoFarEnd kNamesTwoOperations = {"Object Path is NULL in Associators.",
 using MakePath = CMPIObjectPath* (*)(const CMPIBroker*, const std::string& nameSpace, const char* className,
                                      CMPIStatus*);
 
+/// How the path of a reference is made, and the errors.
+struct Family {
+  MakePath makePath;
+  NoFarEnd noFarEnd;
+};
+inline constexpr Family kPathsOnThisHost = {newHostPath, kNamesEachOperation};
+inline constexpr Family kPathsWithoutHost = {newPath, kNamesTwoOperations};
+
+/// The names of an association's two references.
+struct References {
+  const char* first;
+  const char* second;
+};
+inline constexpr References kAntecedentAndDependent = {"Antecedent", "Dependent"};
+inline constexpr References kElementAndSetting = {"ManagedElement", "SettingData"};
+inline constexpr References kGroupAndPart = {"GroupComponent", "PartComponent"};
+
 /// The class that a provider serves.
 struct Association {
-  const std::string category;  ///< of the provider's log lines
+  std::string category;  ///< of the provider's log lines
   const char* className;
-  const char* firstName;  ///< of its references
-  const char* secondName;
-  MakePath makePath;       ///< of references: with this host, or without
-  const char* namedClass;  ///< of the paths that ReferenceNames returns
-  const NoFarEnd& noFarEnd;
+  const Family& family;
+  References references;
+  void (*setOthers)(const CMPIInstance* instance) = nullptr;  ///< sets the properties besides the references
+  const char* namedClass = className;                         ///< of the paths that ReferenceNames returns
 };
 
 // --- Instances or their paths. Associators and References return the first, AssociatorNames and ReferenceNames the
@@ -149,22 +166,25 @@ CMPIStatus referWith(Refer walk, Operation operation, const Association& associa
 
 // --- Objects at the ends.
 
-/// Ask the broker for another provider's objects. False, with an error, if the status has a failing code. The second
+/// Ask the broker for another provider's objects; none, with an error, if the status has a failing code. The second
 /// asks with a new path of the class, and writes noPath if it cannot be made.
 template <typename Found>
-bool askFor(Operation& operation, const CMPIObjectPath* classPath, const CMPIEnumeration*& objects,
-            const char* failed = "CBEnumInstanceNames Failed for the target Class",
-            const Place& place = Place::here()) {
+std::optional<const CMPIEnumeration*> askFor(Operation& operation, const CMPIObjectPath* classPath,
+                                             const char* failed = "CBEnumInstanceNames Failed for the target Class",
+                                             const Place& place = Place::here()) {
   const auto enumerate = kReturnsInstances<Found> ? enumerateInstances : enumerateInstanceNames;
-  objects = enumerate(operation.broker, operation.context, classPath, &operation.status);
-  return operation.status.rc == CMPI_RC_OK || complain(operation, failed, place);
+  const CMPIEnumeration* objects = enumerate(operation.broker, operation.context, classPath, &operation.status);
+  if (operation.status.rc == CMPI_RC_OK) return objects;
+  complain(operation, failed, place);
+  return {};
 }
 template <typename Found>
-bool askForAll(Operation& operation, const std::string& nameSpace, const char* className, const char* noPath,
-               const CMPIEnumeration*& objects, const Place& place = Place::here()) {
+std::optional<const CMPIEnumeration*> askForAll(Operation& operation, const std::string& nameSpace,
+                                                const char* className, const char* noPath,
+                                                const Place& place = Place::here()) {
   const CMPIObjectPath* classPath = newPath(operation.broker, nameSpace, className, &operation.status);
-  if (isMissing(operation, classPath, noPath, place)) return false;
-  return askFor<Found>(operation, classPath, objects, "CBEnumInstanceNames Failed for the target Class", place);
+  if (isMissing(operation, classPath, noPath, place)) return {};
+  return askFor<Found>(operation, classPath, "CBEnumInstanceNames Failed for the target Class", place);
 }
 
 /// A key of the source.
@@ -172,7 +192,7 @@ std::string sourceKey(Operation& operation, const char* name);
 
 // --- Pairs.
 
-/// Sets both references of an instance.
+/// Sets both references of an instance and the association's other properties.
 void setPair(const CMPIInstance* instance, const Association& association, const CMPIObjectPath* first,
              const CMPIObjectPath* second);
 
@@ -180,10 +200,12 @@ void setPair(const CMPIInstance* instance, const Association& association, const
 CMPIInstance* newPair(Operation& operation, const Association& association, const CMPIObjectPath* path,
                       const CMPIObjectPath* first, const CMPIObjectPath* second);
 
-/// A new instance on this host for a builder; the broker's result, good or not. A good one has the filter of the
-/// properties that the client asks for. False, with the text as an error, if its path cannot be made.
-bool newBuilt(Operation& operation, const Association& association, const std::string& nameSpace, const char* noPath,
-              CMPIInstance*& instance, const Place& place = Place::here());
+/// Makes a builder's instance on this host, with the filter of the properties that the client asks for, and adds it
+/// unless the broker makes no good one; notMade is the error then. False, with noPath as an error, if its path cannot
+/// be made.
+bool addBuilt(Operation& operation, const Association& association, const std::string& nameSpace, const char* noPath,
+              const CMPIObjectPath* first, const CMPIObjectPath* second, std::vector<CMPIInstance*>& instances,
+              const char* notMade = nullptr, const Place& place = Place::here());
 
 /// Returns a path on this host with both references as keys. False, with the text as an error, if it cannot be made.
 bool returnPair(Operation& operation, const Association& association, const std::string& nameSpace, const char* noPath,
@@ -195,10 +217,11 @@ bool returnPair(Operation& operation, const Association& association, const std:
 /// that its failures do not reach the client. Returns 0, or 1 if it failed.
 using Builder = unsigned short (*)(Operation operation, std::vector<CMPIInstance*>& instances);
 
-/// An error that ends a builder; always 1, its result. The second also logs the exit: five builders do so if the
-/// settings cannot be fetched.
+/// An error that ends a builder; always 1, its result.
 unsigned short failBuilder(const Operation& operation, const char* text, const Place& place = Place::here());
-unsigned short failAndLeaveBuilder(const Operation& operation, const char* text, const Place& place = Place::here());
+
+/// The end of five builders if the settings cannot be fetched: only they log the exit of a failure. Always 1.
+unsigned short leaveBuilder(const Operation& operation, const Place& place = Place::here());
 
 /// Returns all built instances, or nothing if the builder fails.
 void returnBuilt(const Operation& operation, Builder build);
@@ -234,19 +257,19 @@ void Tokenize(const std::string& text, std::vector<std::string>& tokens, const s
   namespace ZV {                                                                                                      \
   static CMPIStatus stem##_Associators(Operation operation) {                                                         \
     return associateWith(associate<CMPIInstance>, enter(operation, association.category), association,                \
-                         association.noFarEnd.associators);                                                           \
+                         association.family.noFarEnd.associators);                                                    \
   }                                                                                                                   \
   static CMPIStatus stem##_AssociatorNames(Operation operation) {                                                     \
     return associateWith(associate<CMPIObjectPath>, enter(operation, association.category), association,              \
-                         association.noFarEnd.associatorNames);                                                       \
+                         association.family.noFarEnd.associatorNames);                                                \
   }                                                                                                                   \
   static CMPIStatus stem##_References(Operation operation) {                                                          \
     return referWith(refer<CMPIInstance>, enter(operation, association.category), association, association.className, \
-                     association.noFarEnd.references);                                                                \
+                     association.family.noFarEnd.references);                                                         \
   }                                                                                                                   \
   static CMPIStatus stem##_ReferenceNames(Operation operation) {                                                      \
     return referWith(refer<CMPIObjectPath>, enter(operation, association.category), association,                      \
-                     association.namedClass, association.noFarEnd.referenceNames);                                    \
+                     association.namedClass, association.family.noFarEnd.referenceNames);                             \
   }                                                                                                                   \
   }                                                                                                                   \
   ZV_INSTANCE_MI(prefix, stem, refusedModification)                                                                   \

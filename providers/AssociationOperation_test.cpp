@@ -105,7 +105,7 @@ class NewPair : public ::testing::Test {
 
   RecordingBroker broker;
   const std::string category = "Zorvagent.SomeProvider";
-  const Association pairs = {category, "ZORVA_X", "Left", "Right", newPath, "ZORVA_X", kNamesTwoOperations};
+  const Association pairs = {category, "ZORVA_X", kPathsWithoutHost, {"Left", "Right"}};
   Operation operation = named({.broker = broker.cmpi()}, category, "SomeProvider_References");
   CMPIObjectPath* association = broker.make(Path("ZORVA_X"), "association");
   CMPIObjectPath* left = broker.make(Path("ZORVA_L"), "left");

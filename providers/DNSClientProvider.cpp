@@ -2,6 +2,7 @@
 
 #include <cstring>
 
+#include "factory/ClassNames.h"
 #include "factory/DNSClientObjFactory.h"
 #include "factory/InstanceModification.h"
 #include "providers/ProviderFrame.h"
@@ -10,7 +11,6 @@
 namespace ZV {
 
 static const std::string loggerDNSClientProv = "Zorvagent.DNSClientProvider";
-static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
 static const char* const setDNSDomainMethod = "SetDNSDomain";
 static const char* const setDNSServerSearchOrderMethod = "SetDNSServerSearchOrder";
 static const char* const setDNSSuffixSearchOrderMethod = "SetDNSSuffixSearchOrder";
@@ -20,21 +20,18 @@ static const char* const setDNSSuffixSearchOrderMethod = "SetDNSSuffixSearchOrde
 static CMPIStatus DNSClient_EnumInstanceNames(Operation operation) {
   operation = enter(operation, loggerDNSClientProv);
   DNSClientObjFactory factory;
-  std::vector<CMPIObjectPath*> paths;
-  if (!fetchEndpoints(operation, factory, operation.ref, paths))
-    return fail(operation, "getAllDNSClientCMPIObjPaths Failed");
-  for (const CMPIObjectPath* path : paths) returnOne(operation, path);
+  const auto paths = fetchEndpoints<CMPIObjectPath>(operation, factory, operation.ref);
+  if (!paths) return fail(operation, "getAllDNSClientCMPIObjPaths Failed");
+  for (const CMPIObjectPath* path : *paths) returnOne(operation, path);
   return end(operation);
 }
 
 static CMPIStatus DNSClient_EnumInstances(Operation operation) {
   operation = enter(operation, loggerDNSClientProv);
   DNSClientObjFactory factory;
-  std::vector<CMPIInstance*> instances;
-  if (!fetchEndpoints(operation, factory, operation.ref, instances)) {
-    return fail(operation, "getAllDNSClientCMPIInstances Failed");
-  }
-  for (const CMPIInstance* instance : instances) returnOne(operation, instance);
+  const auto instances = fetchEndpoints<CMPIInstance>(operation, factory, operation.ref);
+  if (!instances) return fail(operation, "getAllDNSClientCMPIInstances Failed");
+  for (const CMPIInstance* instance : *instances) returnOne(operation, instance);
   return end(operation);
 }
 
@@ -54,10 +51,9 @@ static CMPIStatus DNSClient_GetInstance(Operation operation) {
     }
     for (const CMPIInstance* instance : instances) returnOne(operation, instance);
   } else {  // all keys count
-    if (!fetchEndpoints(operation, factory, operation.ref, instances)) {
-      return fail(operation, "getAllDNSClientCMPIInstances Failed");
-    }
-    returnFirstEqual(operation, instances, false);
+    const auto all = fetchEndpoints<CMPIInstance>(operation, factory, operation.ref);
+    if (!all) return fail(operation, "getAllDNSClientCMPIInstances Failed");
+    returnFirstEqual(operation, *all, false);
   }
   return end(operation);
 }

@@ -4,6 +4,7 @@
 // An endpoint and a setting data belong together where the InstanceID, split at "%", has the endpoint's name as its
 // second part. The enumerations skip an InstanceID with fewer parts; the association operations stop at it.
 
+#include "factory/ClassNames.h"
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSSettingDataObjects.h"
 #include "providers/AssociationOperation.h"
@@ -11,24 +12,17 @@
 
 namespace ZV {
 
-static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
-static const char* const dnsSettingDataClass = "ZORVA_DNSSettingData";
-static const Association elementSettingData = {"Zorvagent.DNSEndpointElementSettingDataProvider",
-                                               "ZORVA_DNSEndPointElementSettingData",
-                                               "ManagedElement",
-                                               "SettingData",
-                                               newPath,
-                                               "ZORVA_DNSEndPointElementSettingData",
-                                               kNamesTwoOperations};
-
-namespace {
-
-// Both references and the flags: 2 here, 1 for the host-wide settings.
-void setAll(const CMPIInstance* instance, const CMPIObjectPath* endpoint, const CMPIObjectPath* setting) {
-  setPair(instance, elementSettingData, endpoint, setting);
+// The flags: 2 here, 1 for the host-wide settings.
+static void setFlags(const CMPIInstance* instance) {
   setUint16(instance, "IsCurrent", 2);
   setUint16(instance, "IsDefault", 2);
 }
+
+static const Association elementSettingData = {"Zorvagent.DNSEndpointElementSettingDataProvider",
+                                               dnsEndpointElementSettingDataClass, kPathsWithoutHost,
+                                               kElementAndSetting, setFlags};
+
+namespace {
 
 // The interface that an InstanceID names; false if it names none.
 bool interfaceOf(const std::string& instanceID, std::string& interfaceName) {
@@ -52,34 +46,30 @@ static unsigned short DNSEndpointElementSettingDataCMPIInstances(Operation opera
                                                                  std::vector<CMPIInstance*>& instances) {
   operation = enter(operation, elementSettingData.category);
   DNSClientObjFactory factory;
-  std::vector<CMPIObjectPath*> endpoints;
-  if (!fetchEndpoints(operation, factory, operation.ref, endpoints)) {
+  const auto endpoints = fetchEndpoints<CMPIObjectPath>(operation, factory, operation.ref);
+  if (!endpoints) {
     return failBuilder(operation, "Can't get ObjectPaths for DNSClient.             Exiting EnumerateInstanceNames");
   }
-  std::vector<CMPIObjectPath*> settings;
-  if (getAllDNSSettingDataCMPIObjectPaths(broker, operation.ref, &settings, &operation.status) != 0) {
-    return failAndLeaveBuilder(operation, "getAllDNSSettingDataCMPIObjectPaths failed");
-  }
+  const auto settings =
+      fetchSettings<CMPIObjectPath>(operation, operation.ref, "getAllDNSSettingDataCMPIObjectPaths failed");
+  if (!settings) return leaveBuilder(operation);
   const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
-  for (CMPIObjectPath* endpoint : counted16(endpoints)) {
+  for (CMPIObjectPath* endpoint : counted16(*endpoints)) {
     if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Server")) return 1;
     setNameSpace(endpoint, nameSpace);  // its host is not changed
     const std::string name = keyText(endpoint, "Name", &operation.status);
-    for (CMPIObjectPath* setting : counted16(settings)) {
+    for (CMPIObjectPath* setting : counted16(*settings)) {
       if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return 1;
       std::string interfaceName;
       if (!interfaceOf(keyText(setting, "InstanceID", &operation.status), interfaceName)) continue;
       logValue(operation, "instance_tokens[1]", interfaceName);
       if (interfaceName != name) continue;
       setNameSpaceAndHost(setting, nameSpace);
-      CMPIInstance* instance = nullptr;
-      if (!newBuilt(operation, elementSettingData, nameSpace,
-                    "Create CMPIObjectPath failed for                     DNSEndpointElementSettingData.", instance)) {
+      if (!addBuilt(operation, elementSettingData, nameSpace,
+                    "Create CMPIObjectPath failed for                     DNSEndpointElementSettingData.", endpoint,
+                    setting, instances)) {
         return 1;
       }
-      if (!isGood(instance)) continue;
-      setAll(instance, endpoint, setting);
-      instances.push_back(instance);
     }
   }
   markExit(operation);
@@ -110,18 +100,18 @@ static CMPIStatus associate(Operation& operation, DNSClientObjFactory& factory, 
     }
     if (!requireInterfaceOf(operation, sourceKey(operation, "InstanceID"), interfaceName)) return operation.status;
     logInterface<Found>(operation, interfaceName);
-    std::vector<Found*> endpoints;
-    if (!fetchEndpoints(operation, factory, farEnd.path, endpoints)) return operation.status;
+    const auto endpoints = fetchEndpoints<Found>(operation, factory, farEnd.path);
+    if (!endpoints) return operation.status;
     const std::string nameSpace = nameSpaceForPaths<Found>(operation);
-    for (Found* endpoint : counted16(endpoints)) {
+    for (Found* endpoint : counted16(*endpoints)) {
       if (textIn(operation, endpoint, "Name") == interfaceName) returnOnThisHost(operation, endpoint, nameSpace);
     }
   } else if (farEnd.className == dnsSettingDataClass) {
     if (!passesResultClass(operation.resultClass, dnsSettingDataClass, "CIM_DNSSettingData")) return operation.status;
     const std::string name = sourceKey(operation, "Name");
-    std::vector<Found*> settings;
-    if (!fetchSettings(operation, operation.ref, settings)) return operation.status;
-    for (const Found* setting : counted16(settings)) {
+    const auto settings = fetchSettings<Found>(operation, operation.ref);
+    if (!settings) return operation.status;
+    for (const Found* setting : counted16(*settings)) {
       const std::string instanceID = textIn(operation, setting, "InstanceID");
       if (!requireInterfaceOf(operation, instanceID, interfaceName)) return operation.status;
       logInterface<Found>(operation, interfaceName);
@@ -137,9 +127,9 @@ static CMPIStatus refer(Operation& operation, DNSClientObjFactory& factory, cons
   std::string interfaceName;
   if (farEnd.className == dnsSettingDataClass) {
     const std::string name = sourceKey(operation, "Name");
-    std::vector<CMPIObjectPath*> settings;
-    if (!fetchSettings(operation, farEnd.path, settings)) return operation.status;
-    for (CMPIObjectPath* setting : counted16(settings)) {
+    const auto settings = fetchSettings<CMPIObjectPath>(operation, farEnd.path);
+    if (!settings) return operation.status;
+    for (CMPIObjectPath* setting : counted16(*settings)) {
       const CMPIInstance* reference = nullptr;
       // ReferenceNames makes an instance for every candidate, matching or not.
       if (!kReturnsInstances<Found>) reference = newInstance(broker, association, &operation.status);
@@ -148,18 +138,18 @@ static CMPIStatus refer(Operation& operation, DNSClientObjFactory& factory, cons
       if (interfaceName != name) continue;
       setNameSpaceAndHost(setting, nameSpace);
       if (kReturnsInstances<Found>) reference = newInstance(broker, association, &operation.status);
-      setAll(reference, operation.ref, setting);
+      setPair(reference, elementSettingData, operation.ref, setting);
       deliver<Found>(operation, reference, nameSpace);
     }
   } else if (farEnd.className == dnsProtocolEndPointClass) {
     if (!requireInterfaceOf(operation, sourceKey(operation, "InstanceID"), interfaceName)) return operation.status;
-    std::vector<CMPIObjectPath*> endpoints;
-    if (!fetchEndpoints(operation, factory, farEnd.path, endpoints)) return operation.status;
-    for (CMPIObjectPath* endpoint : counted16(endpoints)) {
+    const auto endpoints = fetchEndpoints<CMPIObjectPath>(operation, factory, farEnd.path);
+    if (!endpoints) return operation.status;
+    for (CMPIObjectPath* endpoint : counted16(*endpoints)) {
       if (keyText(endpoint, "Name", &operation.status) != interfaceName) continue;
       setNameSpaceAndHost(endpoint, nameSpace);
       const CMPIInstance* reference = newInstance(broker, association, &operation.status);
-      setAll(reference, endpoint, operation.ref);
+      setPair(reference, elementSettingData, endpoint, operation.ref);
       deliver<Found>(operation, reference, nameSpace);
     }
   }

@@ -4,6 +4,7 @@
 
 #include <stdexcept>
 
+#include "factory/ClassNames.h"
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSGeneralSettingDataObjects.h"
 #include "providers/AssociationOperation.h"
@@ -11,21 +12,12 @@
 
 namespace ZV {
 
-static const char* const dnsGeneralSettingDataClass = "ZORVA_DNSGeneralSettingData";
-static const char* const ipAssignmentSettingDataClass = "ZORVA_IPAssignmentSettingData";
-static const Association orderedComponent = {"Zorvagent.DNSGeneralOrderedComponentProvider",
-                                             "ZORVA_DNSGenOrderedComponent",
-                                             "GroupComponent",
-                                             "PartComponent",
-                                             newPath,
-                                             "ZORVA_DNSGenOrderedComponent",
-                                             kNamesTwoOperations};
+// The position: the interface's own settings come second.
+static void setPosition(const CMPIInstance* instance) { setUint64(instance, "AssignedSequence", 1); }
 
-// Both references and the position: the interface's own settings come second.
-static void setAll(const CMPIInstance* instance, const CMPIObjectPath* group, const CMPIObjectPath* part) {
-  setPair(instance, orderedComponent, group, part);
-  setUint64(instance, "AssignedSequence", 1);
-}
+static const Association orderedComponent = {"Zorvagent.DNSGeneralOrderedComponentProvider",
+                                             dnsGenOrderedComponentClass, kPathsWithoutHost, kGroupAndPart,
+                                             setPosition};
 
 // Throws std::out_of_range if there are none. The provider does not catch it, and a server reports a failed operation
 // with this text.
@@ -41,30 +33,24 @@ static unsigned short DNSGeneralOrderedComponentCMPIInstances(Operation operatio
   const FlowLog flow(orderedComponent.category, ZV_HERE, " ref==", operation.ref, " properties==", operation.properties,
                      " ctx==", operation.context, " instances==", &instances);
   const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
-  const CMPIEnumeration* assignments = nullptr;
-  if (!askForAll<CMPIObjectPath>(operation, nameSpace, ipAssignmentSettingDataClass,
-                                 "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.", assignments)) {
-    return 1;
-  }
-  std::vector<CMPIObjectPath*> settings;
-  if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, operation.ref, &settings, &operation.status) != 0) {
-    return failAndLeaveBuilder(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
-  }
-  while (hasNext(assignments, &operation.status)) {
-    const CMPIObjectPath* assignment = nextPath(assignments, &operation.status);
+  const auto assignments = askForAll<CMPIObjectPath>(operation, nameSpace, ipAssignmentSettingDataClass,
+                                                     "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.");
+  if (!assignments) return 1;
+  const auto settings = fetchGeneralSettings<CMPIObjectPath>(operation, operation.ref,
+                                                             "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
+  if (!settings) return leaveBuilder(operation);
+  while (hasNext(*assignments, &operation.status)) {
+    const CMPIObjectPath* assignment = nextPath(*assignments, &operation.status);
     keyText(assignment, "InstanceID", &operation.status);  // read, like the other key below, but not compared
-    CMPIObjectPath* setting = firstOf(settings);
+    CMPIObjectPath* setting = firstOf(*settings);
     if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return 1;
     keyText(setting, "InstanceID", &operation.status);
     setNameSpaceAndHost(setting, nameSpace);
-    CMPIInstance* instance = nullptr;
-    if (!newBuilt(operation, orderedComponent, nameSpace,
-                  "Create CMPIObjectPath failed for                     DNSGeneralOrderedComponent.", instance)) {
+    if (!addBuilt(operation, orderedComponent, nameSpace,
+                  "Create CMPIObjectPath failed for                     DNSGeneralOrderedComponent.", assignment,
+                  setting, instances)) {
       return 1;
     }
-    if (!isGood(instance)) continue;
-    setAll(instance, assignment, setting);
-    instances.push_back(instance);
   }
   flow.exit();
   return 0;
@@ -87,21 +73,19 @@ static CMPIStatus associate(Operation& operation, DNSClientObjFactory&, const Fa
     if (!passesResultClass(operation.resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData")) {
       return operation.status;
     }
-    const CMPIEnumeration* assignments = nullptr;
-    if (!askForAll<Found>(operation, nameSpaceOf(operation.ref, &operation.status), ipAssignmentSettingDataClass,
-                          either<Found>("Create CMPIObjectPath failed for ipAssignmentSettingDataClass.",
-                                        "Create CMPIObjectPath failed for ComputerSystem."),
-                          assignments)) {
-      return operation.status;
-    }
-    while (hasNext(assignments, &operation.status)) returnOne(operation, next<Found>(operation, assignments));
+    const auto assignments =
+        askForAll<Found>(operation, nameSpaceOf(operation.ref, &operation.status), ipAssignmentSettingDataClass,
+                         either<Found>("Create CMPIObjectPath failed for ipAssignmentSettingDataClass.",
+                                       "Create CMPIObjectPath failed for ComputerSystem."));
+    if (!assignments) return operation.status;
+    while (hasNext(*assignments, &operation.status)) returnOne(operation, next<Found>(operation, *assignments));
   } else if (farEnd.className == dnsGeneralSettingDataClass) {
     if (!passesResultClass(operation.resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) {
       return operation.status;
     }
-    std::vector<Found*> settings;
-    if (!fetchGeneralSettings(operation, operation.ref, settings)) return operation.status;
-    returnAll(operation, settings);
+    const auto settings = fetchGeneralSettings<Found>(operation, operation.ref);
+    if (!settings) return operation.status;
+    returnAll(operation, *settings);
   }
   return end(operation);
 }
@@ -110,22 +94,22 @@ template <typename Found>
 static CMPIStatus refer(Operation& operation, DNSClientObjFactory&, const ReferenceParts& parts) {
   const auto& [farEnd, nameSpace, association] = parts;
   if (farEnd.className == dnsGeneralSettingDataClass) {
-    std::vector<CMPIObjectPath*> settings;
-    if (!fetchGeneralSettings(operation, farEnd.path, settings)) return operation.status;
-    for (CMPIObjectPath* setting : counted16(settings)) {  // every one; the builder uses only the first
+    const auto settings = fetchGeneralSettings<CMPIObjectPath>(operation, farEnd.path);
+    if (!settings) return operation.status;
+    for (CMPIObjectPath* setting : counted16(*settings)) {  // every one; the builder uses only the first
       const CMPIInstance* reference = newInstance(broker, association, &operation.status);
       setNameSpaceAndHost(setting, nameSpace);
-      setAll(reference, operation.ref, setting);
+      setPair(reference, orderedComponent, operation.ref, setting);
       deliver<Found>(operation, reference, nameSpace);
     }
   } else if (farEnd.className == ipAssignmentSettingDataClass) {
-    const CMPIEnumeration* assignments = nullptr;
-    if (!askFor<CMPIObjectPath>(operation, farEnd.path, assignments)) return operation.status;
-    while (hasNext(assignments, &operation.status)) {
-      nextPath(assignments, &operation.status);  // only counted: each part is the far end's class without keys
+    const auto assignments = askFor<CMPIObjectPath>(operation, farEnd.path);
+    if (!assignments) return operation.status;
+    while (hasNext(*assignments, &operation.status)) {
+      nextPath(*assignments, &operation.status);  // only counted: each part is the far end's class without keys
       const CMPIInstance* reference = newInstance(broker, association, &operation.status);
       // The source is the group; the builder has them the other way round.
-      setAll(reference, operation.ref, farEnd.path);
+      setPair(reference, orderedComponent, operation.ref, farEnd.path);
       deliver<Found>(operation, reference, nameSpace);
     }
   }

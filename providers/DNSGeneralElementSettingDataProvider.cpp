@@ -4,6 +4,7 @@
 // The enumerations pair a system with settings whose InstanceID contains its Name. The association operations compare
 // no key.
 
+#include "factory/ClassNames.h"
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSGeneralSettingDataObjects.h"
 #include "providers/AssociationOperation.h"
@@ -11,55 +12,37 @@
 
 namespace ZV {
 
-static const char* const computerSystemClass = "ZORVA_ComputerSystem";
-static const char* const dnsGeneralSettingDataClass = "ZORVA_DNSGeneralSettingData";
-static const Association elementSettingData = {"Zorvagent.DNSGeneralElementSettingDataProvider",
-                                               "ZORVA_DNSGeneralElementSettingData",
-                                               "ManagedElement",
-                                               "SettingData",
-                                               newPath,
-                                               "ZORVA_DNSGeneralElementSettingData",
-                                               kNamesTwoOperations};
-
-// Both references and the flags: 1 here, 2 for the settings of single endpoints.
-static void setAll(const CMPIInstance* instance, const CMPIObjectPath* system, const CMPIObjectPath* setting) {
-  setPair(instance, elementSettingData, system, setting);
+// The flags: 1 here, 2 for the settings of single endpoints.
+static void setFlags(const CMPIInstance* instance) {
   setUint16(instance, "IsCurrent", 1);
   setUint16(instance, "IsDefault", 1);
 }
+
+static const Association elementSettingData = {"Zorvagent.DNSGeneralElementSettingDataProvider",
+                                               dnsGeneralElementSettingDataClass, kPathsWithoutHost, kElementAndSetting,
+                                               setFlags};
 
 static unsigned short DNSGeneralElementSettingDataCMPIInstances(Operation operation,
                                                                 std::vector<CMPIInstance*>& instances) {
   operation = enter(operation, elementSettingData.category);
   const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
-  const CMPIEnumeration* systems = nullptr;
-  if (!askForAll<CMPIObjectPath>(operation, nameSpace, computerSystemClass,
-                                 "Create CMPIObjectPath failed for ComputerSystem.", systems)) {
-    return 1;
-  }
-  std::vector<CMPIObjectPath*> settings;
-  if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, operation.ref, &settings, &operation.status) != 0) {
-    return failAndLeaveBuilder(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
-  }
-  while (hasNext(systems, &operation.status)) {
-    const CMPIObjectPath* system = nextPath(systems, &operation.status);
+  const auto systems = askForAll<CMPIObjectPath>(operation, nameSpace, computerSystemClass,
+                                                 "Create CMPIObjectPath failed for ComputerSystem.");
+  if (!systems) return 1;
+  const auto settings = fetchGeneralSettings<CMPIObjectPath>(operation, operation.ref,
+                                                             "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
+  if (!settings) return leaveBuilder(operation);
+  while (hasNext(*systems, &operation.status)) {
+    const CMPIObjectPath* system = nextPath(*systems, &operation.status);
     const std::string name = keyText(system, "Name", &operation.status);
-    for (CMPIObjectPath* setting : counted16(settings)) {
+    for (CMPIObjectPath* setting : counted16(*settings)) {
       if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return 1;
       if (keyText(setting, "InstanceID", &operation.status).find(name) == std::string::npos) continue;
       setNameSpaceAndHost(setting, nameSpace);
-      CMPIInstance* instance = nullptr;
-      if (!newBuilt(operation, elementSettingData, nameSpace,
-                    "Create CMPIObjectPath failed for                         DNSGeneralElementSettingData.",
-                    instance)) {
+      if (!addBuilt(operation, elementSettingData, nameSpace,
+                    "Create CMPIObjectPath failed for                         DNSGeneralElementSettingData.", system,
+                    setting, instances, "Key is not matched"))
         return 1;
-      }
-      if (isGood(instance)) {
-        setAll(instance, system, setting);
-        instances.push_back(instance);
-      } else {
-        complain(operation, "Key is not matched");
-      }
     }
   }
   markExit(operation);
@@ -72,19 +55,16 @@ ZV_BUILT_INSTANCES(DNSGeneralElementSettingData, elementSettingData, DNSGeneralE
 static CMPIStatus DNSGeneralElementSettingData_EnumInstanceNames(Operation operation) {
   operation = enter(operation, elementSettingData.category);
   const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
-  const CMPIEnumeration* systems = nullptr;
-  if (!askForAll<CMPIObjectPath>(operation, nameSpace, computerSystemClass,
-                                 "Create CMPIObjectPath failed for computerSystemClass.", systems)) {
-    return operation.status;
-  }
-  std::vector<CMPIObjectPath*> settings;
-  if (getAllDNSGeneralSettingDataCMPIObjectPaths(broker, operation.ref, &settings, &operation.status) != 0) {
-    return fail(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
-  }
-  while (hasNext(systems, &operation.status)) {
-    const CMPIObjectPath* system = nextPath(systems, &operation.status);
+  const auto systems = askForAll<CMPIObjectPath>(operation, nameSpace, computerSystemClass,
+                                                 "Create CMPIObjectPath failed for computerSystemClass.");
+  if (!systems) return operation.status;
+  const auto settings = fetchGeneralSettings<CMPIObjectPath>(operation, operation.ref,
+                                                             "getAllDNSGeneralSettingDataCMPIObjectPaths failed");
+  if (!settings) return operation.status;
+  while (hasNext(*systems, &operation.status)) {
+    const CMPIObjectPath* system = nextPath(*systems, &operation.status);
     const std::string name = keyText(system, "Name", &operation.status);
-    for (CMPIObjectPath* setting : counted16(settings)) {
+    for (CMPIObjectPath* setting : counted16(*settings)) {
       if (keyText(setting, "InstanceID", &operation.status).find(name) == std::string::npos) {
         complain(operation, "Key is not matched");
         continue;
@@ -108,19 +88,17 @@ template <typename Found>
 static CMPIStatus associate(Operation& operation, DNSClientObjFactory&, const FarEnd& farEnd) {
   if (farEnd.className == computerSystemClass) {
     if (!passesResultClass(operation.resultClass, computerSystemClass, "CIM_ComputerSystem")) return operation.status;
-    const CMPIEnumeration* systems = nullptr;
-    if (!askForAll<Found>(operation, nameSpaceOf(operation.ref, &operation.status), computerSystemClass,
-                          "Create CMPIObjectPath failed for ComputerSystem.", systems)) {
-      return operation.status;
-    }
-    while (hasNext(systems, &operation.status)) returnOne(operation, next<Found>(operation, systems));
+    const auto systems = askForAll<Found>(operation, nameSpaceOf(operation.ref, &operation.status), computerSystemClass,
+                                          "Create CMPIObjectPath failed for ComputerSystem.");
+    if (!systems) return operation.status;
+    while (hasNext(*systems, &operation.status)) returnOne(operation, next<Found>(operation, *systems));
   } else if (farEnd.className == dnsGeneralSettingDataClass) {
     if (!passesResultClass(operation.resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) {
       return operation.status;
     }
-    std::vector<Found*> settings;
-    if (!fetchGeneralSettings(operation, operation.ref, settings)) return operation.status;
-    returnAll(operation, settings);
+    const auto settings = fetchGeneralSettings<Found>(operation, operation.ref);
+    if (!settings) return operation.status;
+    returnAll(operation, *settings);
   }
   return end(operation);
 }
@@ -129,21 +107,21 @@ template <typename Found>
 static CMPIStatus refer(Operation& operation, DNSClientObjFactory&, const ReferenceParts& parts) {
   const auto& [farEnd, nameSpace, association] = parts;
   if (farEnd.className == dnsGeneralSettingDataClass) {
-    std::vector<CMPIObjectPath*> settings;
-    if (!fetchGeneralSettings(operation, farEnd.path, settings)) return operation.status;
-    for (CMPIObjectPath* setting : counted16(settings)) {
+    const auto settings = fetchGeneralSettings<CMPIObjectPath>(operation, farEnd.path);
+    if (!settings) return operation.status;
+    for (CMPIObjectPath* setting : counted16(*settings)) {
       const CMPIInstance* reference = newInstance(broker, association, &operation.status);
       setNameSpaceAndHost(setting, nameSpace);
-      setAll(reference, operation.ref, setting);
+      setPair(reference, elementSettingData, operation.ref, setting);
       deliver<Found>(operation, reference, nameSpace);
     }
   } else if (farEnd.className == computerSystemClass) {
-    const CMPIEnumeration* systems = nullptr;
-    if (!askFor<CMPIObjectPath>(operation, farEnd.path, systems)) return operation.status;
-    while (hasNext(systems, &operation.status)) {
-      nextPath(systems, &operation.status);  // only counted: each reference names the far end's class without keys
+    const auto systems = askFor<CMPIObjectPath>(operation, farEnd.path);
+    if (!systems) return operation.status;
+    while (hasNext(*systems, &operation.status)) {
+      nextPath(*systems, &operation.status);  // only counted: each reference names the far end's class without keys
       const CMPIInstance* reference = newInstance(broker, association, &operation.status);
-      setAll(reference, farEnd.path, operation.ref);
+      setPair(reference, elementSettingData, farEnd.path, operation.ref);
       deliver<Found>(operation, reference, nameSpace);
     }
   }

@@ -13,17 +13,17 @@ static const std::string loggerDNSGeneralSettingDataProv = "Zorvagent.DNSGeneral
 
 static CMPIStatus DNSGeneralSettingData_EnumInstanceNames(Operation operation) {
   operation = enter(operation, loggerDNSGeneralSettingDataProv);
-  std::vector<CMPIObjectPath*> paths;
-  if (!fetchGeneralSettings(operation, operation.ref, paths)) return operation.status;
-  returnAll(operation, paths);
+  const auto paths = fetchGeneralSettings<CMPIObjectPath>(operation, operation.ref);
+  if (!paths) return operation.status;
+  returnAll(operation, *paths);
   return end(operation);
 }
 
 static CMPIStatus DNSGeneralSettingData_EnumInstances(Operation operation) {
   operation = enter(operation, loggerDNSGeneralSettingDataProv);
-  std::vector<CMPIInstance*> instances;
-  if (!fetchGeneralSettings(operation, operation.ref, instances)) return operation.status;
-  returnAll(operation, instances);
+  const auto instances = fetchGeneralSettings<CMPIInstance>(operation, operation.ref);
+  if (!instances) return operation.status;
+  returnAll(operation, *instances);
   return end(operation);
 }
 

@@ -7,40 +7,32 @@
 
 #include <strings.h>
 
+#include "factory/ClassNames.h"
 #include "factory/DNSClientObjFactory.h"
 #include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"
 
 namespace ZV {
 
-static const char* const computerSystemClass = "ZORVA_ComputerSystem";
-static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
-static const Association hostedAccessPoint = {"Zorvagent.DNSHostedAccessPointProvider",
-                                              "ZORVA_DNSHostedAccessPoint",
-                                              "Antecedent",
-                                              "Dependent",
-                                              newHostPath,
-                                              "ZORVA_DNSHostedAccessPoint",
-                                              kNamesEachOperation};
+static const Association hostedAccessPoint = {"Zorvagent.DNSHostedAccessPointProvider", dnsHostedAccessPointClass,
+                                              kPathsOnThisHost, kAntecedentAndDependent};
 
 static unsigned short DNSHostedAccessPointCMPIInstances(Operation operation, std::vector<CMPIInstance*>& instances) {
   operation = enter(operation, hostedAccessPoint.category);
   DNSClientObjFactory factory;
   const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
-  const CMPIEnumeration* systems = nullptr;
-  if (!askForAll<CMPIObjectPath>(operation, nameSpace, computerSystemClass,
-                                 "Create CMPIObjectPath failed for ComputerSystem.", systems)) {
-    return 1;
-  }
-  while (hasNext(systems, &operation.status)) {
-    const CMPIObjectPath* system = nextPath(systems, &operation.status);
+  const auto systems = askForAll<CMPIObjectPath>(operation, nameSpace, computerSystemClass,
+                                                 "Create CMPIObjectPath failed for ComputerSystem.");
+  if (!systems) return 1;
+  while (hasNext(*systems, &operation.status)) {
+    const CMPIObjectPath* system = nextPath(*systems, &operation.status);
     const std::string name = keyText(system, "Name", &operation.status);
-    std::vector<CMPIObjectPath*> endpoints;
-    if (!fetchEndpoints(operation, factory, operation.ref, endpoints)) {
+    const auto endpoints = fetchEndpoints<CMPIObjectPath>(operation, factory, operation.ref);
+    if (!endpoints) {
       return failBuilder(operation,
                          "***Can't get DNS Client ObjectPaths.                 Exiting EnumerateInstanceNames***");
     }
-    for (CMPIObjectPath* endpoint : counted16(endpoints)) {
+    for (CMPIObjectPath* endpoint : counted16(*endpoints)) {
       if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Client")) return 1;
       if (name.find(keyText(endpoint, "SystemName", &operation.status)) == std::string::npos) continue;
       setNameSpace(endpoint, nameSpace);
@@ -66,19 +58,17 @@ static CMPIStatus DNSHostedAccessPoint_EnumInstanceNames(Operation operation) {
   operation = enter(operation, hostedAccessPoint.category);
   DNSClientObjFactory factory;
   const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
-  const CMPIEnumeration* systems = nullptr;
-  if (!askForAll<CMPIObjectPath>(operation, nameSpace, computerSystemClass,
-                                 "Create CMPIObjectPath failed for ComputerSystem.", systems)) {
-    return operation.status;
-  }
-  while (hasNext(systems, &operation.status)) {
-    const CMPIObjectPath* system = nextPath(systems, &operation.status);
+  const auto systems = askForAll<CMPIObjectPath>(operation, nameSpace, computerSystemClass,
+                                                 "Create CMPIObjectPath failed for ComputerSystem.");
+  if (!systems) return operation.status;
+  while (hasNext(*systems, &operation.status)) {
+    const CMPIObjectPath* system = nextPath(*systems, &operation.status);
     const std::string name = keyText(system, "Name", &operation.status);
-    std::vector<CMPIObjectPath*> endpoints;
-    if (!fetchEndpoints(operation, factory, operation.ref, endpoints)) {
+    const auto endpoints = fetchEndpoints<CMPIObjectPath>(operation, factory, operation.ref);
+    if (!endpoints) {
       return fail(operation, "***Can't get DNS Client ObjectPaths.                  Exiting EnumerateInstanceNames***");
     }
-    for (CMPIObjectPath* endpoint : counted16(endpoints)) {
+    for (CMPIObjectPath* endpoint : counted16(*endpoints)) {
       if (isMissing(operation, endpoint, "CMPIObjectPath is NULL for DNS Client")) return operation.status;
       if (name != keyText(endpoint, "SystemName", &operation.status)) continue;  // the builder also accepts a part
       setNameSpace(endpoint, nameSpace);
@@ -103,14 +93,12 @@ static CMPIStatus associate(Operation& operation, DNSClientObjFactory& factory, 
   if (farEnd.className == computerSystemClass) {
     const std::string systemName = sourceKey(operation, "SystemName");
     if (!passesResultClass(operation.resultClass, computerSystemClass, "CIM_ComputerSystem")) return operation.status;
-    const CMPIEnumeration* systems = nullptr;
-    if (!askFor<Found>(operation, farEnd.path, systems,
-                       either<Found>("CBEnumInstances Failed for the target Class",
-                                     "CBEnumInstanceNames Failed for the target Class"))) {
-      return operation.status;
-    }
-    while (hasNext(systems, &operation.status)) {
-      Found* system = next<Found>(operation, systems);
+    const auto systems = askFor<Found>(operation, farEnd.path,
+                                       either<Found>("CBEnumInstances Failed for the target Class",
+                                                     "CBEnumInstanceNames Failed for the target Class"));
+    if (!systems) return operation.status;
+    while (hasNext(*systems, &operation.status)) {
+      Found* system = next<Found>(operation, *systems);
       if (keyText(pathOf(operation, system), "Name", &operation.status) == systemName) returnOne(operation, system);
     }
   } else if (farEnd.className == dnsProtocolEndPointClass) {
@@ -118,15 +106,15 @@ static CMPIStatus associate(Operation& operation, DNSClientObjFactory& factory, 
     if (!passesResultClass(operation.resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndpoint")) {
       return operation.status;
     }
-    std::vector<Found*> endpoints;
-    if (!fetchEndpoints(operation, factory, farEnd.path, endpoints)) {
+    const auto endpoints = fetchEndpoints<Found>(operation, factory, farEnd.path);
+    if (!endpoints) {
       return fail(operation,
                   either<Found>("***Can't get DNS Client ObjectPaths.                 Exiting Associators***",
                                 "***Can't get Service processor ObjectPaths.                 Exiting "
                                 "AssociatorNames***"));
     }
     const std::string nameSpace = nameSpaceForPaths<Found>(operation);
-    for (Found* endpoint : counted16(endpoints)) {
+    for (Found* endpoint : counted16(*endpoints)) {
       if (textIn(operation, endpoint, "SystemName") != name) continue;
       if (!isOfComputerSystem(textIn(operation, endpoint, "SystemCreationClassName"))) continue;
       returnOnThisHost(operation, endpoint, nameSpace);
@@ -140,11 +128,11 @@ static CMPIStatus refer(Operation& operation, DNSClientObjFactory& factory, cons
   const auto& [farEnd, nameSpace, association] = parts;
   if (farEnd.className == dnsProtocolEndPointClass) {
     const std::string name = sourceKey(operation, "Name");
-    std::vector<CMPIObjectPath*> endpoints;
-    if (!fetchEndpoints(operation, factory, farEnd.path, endpoints)) {
+    const auto endpoints = fetchEndpoints<CMPIObjectPath>(operation, factory, farEnd.path);
+    if (!endpoints) {
       return fail(operation, "***Can't get DNS Client instances                 Exiting References***");
     }
-    for (CMPIObjectPath* endpoint : counted16(endpoints)) {
+    for (CMPIObjectPath* endpoint : counted16(*endpoints)) {
       if (keyText(endpoint, "SystemName", &operation.status) != name) continue;
       const CMPIInstance* reference = newInstance(broker, association, &operation.status);
       setNameSpaceAndHost(endpoint, nameSpace);
@@ -153,10 +141,10 @@ static CMPIStatus refer(Operation& operation, DNSClientObjFactory& factory, cons
     }
   } else if (farEnd.className == computerSystemClass) {
     const std::string systemName = sourceKey(operation, "SystemName");
-    const CMPIEnumeration* systems = nullptr;
-    if (!askFor<CMPIObjectPath>(operation, farEnd.path, systems)) return operation.status;
-    while (hasNext(systems, &operation.status)) {
-      const CMPIObjectPath* system = nextPath(systems, &operation.status);
+    const auto systems = askFor<CMPIObjectPath>(operation, farEnd.path);
+    if (!systems) return operation.status;
+    while (hasNext(*systems, &operation.status)) {
+      const CMPIObjectPath* system = nextPath(*systems, &operation.status);
       if (keyText(system, "Name", &operation.status) != systemName) continue;
       const CMPIInstance* reference = newPair(operation, hostedAccessPoint, association, system, operation.ref);
       deliverOnThisHost<Found>(operation, reference, nameSpace);

@@ -5,6 +5,7 @@
 // the DNS setting's InstanceID. If it has no "%", the builder uses the whole text; the association operations stop at
 // it.
 
+#include "factory/ClassNames.h"
 #include "factory/DNSClientObjFactory.h"
 #include "factory/DNSSettingDataObjects.h"
 #include "providers/AssociationOperation.h"
@@ -12,23 +13,13 @@
 
 namespace ZV {
 
-static const char* const dnsSettingDataClass = "ZORVA_DNSSettingData";
-static const char* const ipAssignmentSettingDataClass = "ZORVA_IPAssignmentSettingData";
-static const Association orderedComponent = {"Zorvagent.DNSOrderedComponentProvider",
-                                             "ZORVA_DNSOrderedComponent",
-                                             "GroupComponent",
-                                             "PartComponent",
-                                             newPath,
-                                             "ZORVA_DNSOrderedComponent",
-                                             kNamesTwoOperations};
+// The position: the host-wide settings come first.
+static void setPosition(const CMPIInstance* instance) { setUint64(instance, "AssignedSequence", 2); }
+
+static const Association orderedComponent = {"Zorvagent.DNSOrderedComponentProvider", dnsOrderedComponentClass,
+                                             kPathsWithoutHost, kGroupAndPart, setPosition};
 
 namespace {
-
-// Both references and the position: the host-wide settings come first.
-void setAll(const CMPIInstance* instance, const CMPIObjectPath* group, const CMPIObjectPath* part) {
-  setPair(instance, orderedComponent, group, part);
-  setUint64(instance, "AssignedSequence", 2);
-}
 
 // The DNS setting's InstanceID within that of an IP assignment; false if the operation cannot continue without a "%".
 bool requireTarget(const Operation& operation, const std::string& instanceID, std::string& target,
@@ -46,32 +37,26 @@ static unsigned short DNSOrderedComponentCMPIInstances(Operation operation, std:
   const FlowLog flow(orderedComponent.category, ZV_HERE, " ref=", operation.ref, " properties=", operation.properties,
                      " ctx=", operation.context, " instances=", &instances);
   const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
-  const CMPIEnumeration* assignments = nullptr;
-  if (!askForAll<CMPIObjectPath>(operation, nameSpace, ipAssignmentSettingDataClass,
-                                 "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.", assignments)) {
-    return 1;
-  }
-  std::vector<CMPIObjectPath*> settings;
-  if (getAllDNSSettingDataCMPIObjectPaths(broker, operation.ref, &settings, &operation.status) != 0) {
-    return failAndLeaveBuilder(operation, "getAllDNSSettingDataCMPIObjectPaths failed");
-  }
-  while (hasNext(assignments, &operation.status)) {
-    const CMPIObjectPath* assignment = nextPath(assignments, &operation.status);
+  const auto assignments = askForAll<CMPIObjectPath>(operation, nameSpace, ipAssignmentSettingDataClass,
+                                                     "Create CMPIObjectPath failed for ipAssignmentSettingDataClass.");
+  if (!assignments) return 1;
+  const auto settings =
+      fetchSettings<CMPIObjectPath>(operation, operation.ref, "getAllDNSSettingDataCMPIObjectPaths failed");
+  if (!settings) return leaveBuilder(operation);
+  while (hasNext(*assignments, &operation.status)) {
+    const CMPIObjectPath* assignment = nextPath(*assignments, &operation.status);
     const std::string instanceID = keyText(assignment, "InstanceID", &operation.status);
     const std::string target = instanceID.substr(0, instanceID.rfind('%'));  // without a "%" the whole text
     logValue(operation, "target", target);
-    for (CMPIObjectPath* setting : counted16(settings)) {
+    for (CMPIObjectPath* setting : counted16(*settings)) {
       if (isMissing(operation, setting, "CMPIObjectPath is NULL for DNS Client")) return 1;
       if (keyText(setting, "InstanceID", &operation.status) != target) continue;
       setNameSpaceAndHost(setting, nameSpace);
-      CMPIInstance* instance = nullptr;
-      if (!newBuilt(operation, orderedComponent, nameSpace,
-                    "Create CMPIObjectPath failed for                         DNSOrderedComponent.", instance)) {
+      if (!addBuilt(operation, orderedComponent, nameSpace,
+                    "Create CMPIObjectPath failed for                         DNSOrderedComponent.", assignment,
+                    setting, instances)) {
         return 1;
       }
-      if (!isGood(instance)) continue;
-      setAll(instance, assignment, setting);
-      instances.push_back(instance);
     }
   }
   flow.exit();
@@ -95,24 +80,22 @@ static CMPIStatus associate(Operation& operation, DNSClientObjFactory&, const Fa
     if (!passesResultClass(operation.resultClass, ipAssignmentSettingDataClass, "CIM_IPAssignmentSettingData")) {
       return operation.status;
     }
-    const CMPIEnumeration* assignments = nullptr;
-    if (!askForAll<Found>(operation, nameSpaceOf(operation.ref, &operation.status), ipAssignmentSettingDataClass,
-                          either<Found>("Create CMPIObjectPath failed for ipAssignmentSettingDataClass.",
-                                        "Create CMPIObjectPath failed for ComputerSystem."),
-                          assignments)) {
-      return operation.status;
-    }
-    while (hasNext(assignments, &operation.status)) {
-      Found* assignment = next<Found>(operation, assignments);
+    const auto assignments =
+        askForAll<Found>(operation, nameSpaceOf(operation.ref, &operation.status), ipAssignmentSettingDataClass,
+                         either<Found>("Create CMPIObjectPath failed for ipAssignmentSettingDataClass.",
+                                       "Create CMPIObjectPath failed for ComputerSystem."));
+    if (!assignments) return operation.status;
+    while (hasNext(*assignments, &operation.status)) {
+      Found* assignment = next<Found>(operation, *assignments);
       const std::string instanceID = keyText(pathOf(operation, assignment), "InstanceID", &operation.status);
       if (!requireTarget(operation, instanceID, target)) return operation.status;
       if (target == sourceID) returnOne(operation, assignment);
     }
   } else if (farEnd.className == dnsSettingDataClass) {
     if (!passesResultClass(operation.resultClass, dnsSettingDataClass, "CIM_DNSSettingData")) return operation.status;
-    std::vector<Found*> settings;
-    if (!fetchSettings(operation, operation.ref, settings)) return operation.status;
-    for (Found* setting : counted16(settings)) {
+    const auto settings = fetchSettings<Found>(operation, operation.ref);
+    if (!settings) return operation.status;
+    for (Found* setting : counted16(*settings)) {
       const std::string instanceID = keyText(pathOf(operation, setting), "InstanceID", &operation.status);
       if (!requireTarget(operation, sourceID, target)) return operation.status;  // only if there is a candidate
       if (target == instanceID) returnOne(operation, setting);
@@ -127,30 +110,30 @@ static CMPIStatus refer(Operation& operation, DNSClientObjFactory&, const Refere
   const std::string sourceID = sourceKey(operation, "InstanceID");
   std::string target;
   if (farEnd.className == dnsSettingDataClass) {
-    std::vector<CMPIObjectPath*> settings;
-    if (!fetchSettings(operation, farEnd.path, settings)) return operation.status;
-    for (CMPIObjectPath* setting : counted16(settings)) {
+    const auto settings = fetchSettings<CMPIObjectPath>(operation, farEnd.path);
+    if (!settings) return operation.status;
+    for (CMPIObjectPath* setting : counted16(*settings)) {
       // Made whether it matches or not.
       const CMPIInstance* reference = newInstance(broker, association, &operation.status);
       const std::string instanceID = keyText(setting, "InstanceID", &operation.status);
       if (!requireTarget(operation, sourceID, target)) return operation.status;
       if (target != instanceID) continue;
       setNameSpaceAndHost(setting, nameSpace);
-      setAll(reference, operation.ref, setting);
+      setPair(reference, orderedComponent, operation.ref, setting);
       deliver<Found>(operation, reference, nameSpace);
     }
   } else if (farEnd.className == ipAssignmentSettingDataClass) {
-    const CMPIEnumeration* assignments = nullptr;
-    if (!askFor<CMPIObjectPath>(operation, farEnd.path, assignments)) return operation.status;
+    const auto assignments = askFor<CMPIObjectPath>(operation, farEnd.path);
+    if (!assignments) return operation.status;
     // The far end's class without keys in the references, the source in their names.
     const CMPIObjectPath* part = either<Found, const CMPIObjectPath*>(farEnd.path, operation.ref);
-    while (hasNext(assignments, &operation.status)) {
-      const CMPIObjectPath* assignment = nextPath(assignments, &operation.status);
+    while (hasNext(*assignments, &operation.status)) {
+      const CMPIObjectPath* assignment = nextPath(*assignments, &operation.status);
       const std::string instanceID = keyText(assignment, "InstanceID", &operation.status);
       if (!requireTarget(operation, instanceID, target)) return operation.status;
       if (target != sourceID) continue;
       const CMPIInstance* reference = newInstance(broker, association, &operation.status);
-      setAll(reference, assignment, part);
+      setPair(reference, orderedComponent, assignment, part);
       deliver<Found>(operation, reference, nameSpace);
     }
   }

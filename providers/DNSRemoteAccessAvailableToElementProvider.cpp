@@ -1,21 +1,16 @@
 // ZORVA_RemoteAccessAvailableToElement: every DNS server is available to every endpoint. Instance and association
 // provider; all objects come from the factory.
 
+#include "factory/ClassNames.h"
 #include "factory/DNSClientObjFactory.h"
 #include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"
 
 namespace ZV {
 
-static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
-static const char* const remoteServiceAccessPointClass = "ZORVA_RemoteServiceAccessPoint";
 static const Association remoteAccess = {"Zorvagent.DNSRemoteAccessAvailableToElementProvider",
-                                         "ZORVA_RemoteAccessAvailableToElement",
-                                         "Antecedent",
-                                         "Dependent",
-                                         newHostPath,
-                                         "ZORVA_RemoteAccessAvailableToElement",
-                                         kNamesEachOperation};
+                                         remoteAccessAvailableToElementClass, kPathsOnThisHost,
+                                         kAntecedentAndDependent};
 
 static unsigned short RemoteAccessAvailableToElementCMPIInstances(Operation operation,
                                                                   std::vector<CMPIInstance*>& instances) {
@@ -23,19 +18,19 @@ static unsigned short RemoteAccessAvailableToElementCMPIInstances(Operation oper
   const FlowLog flow(remoteAccess.category, ZV_HERE, " ref=", operation.ref, " properties=", operation.properties,
                      " instances=", &instances);
   DNSClientObjFactory factory;
-  std::vector<CMPIObjectPath*> servers;
-  if (!fetchServers(operation, factory, operation.ref, servers)) {
+  const auto servers = fetchServers<CMPIObjectPath>(operation, factory, operation.ref);
+  if (!servers) {
     return failBuilder(operation, "***Can't get DNS Server ObjectPaths.             Exiting EnumerateInstanceNames***");
   }
   const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
-  for (CMPIObjectPath* server : counted16(servers)) {
+  for (CMPIObjectPath* server : counted16(*servers)) {
     if (isMissing(operation, server, "CMPIObjectPath is NULL for DNS Server")) return 1;
-    std::vector<CMPIObjectPath*> clients;  // made again for every server
-    if (!fetchEndpoints(operation, factory, operation.ref, clients)) {
+    const auto clients = fetchEndpoints<CMPIObjectPath>(operation, factory, operation.ref);  // again for every server
+    if (!clients) {
       return failBuilder(operation,
                          "***Can't get ObjectPaths for DNSClient.                 Exiting EnumerateInstanceNames***");
     }
-    for (const CMPIObjectPath* client : counted16(clients)) {
+    for (const CMPIObjectPath* client : counted16(*clients)) {
       if (isMissing(operation, client, "CMPIObjectPath is NULL for DNSClient")) return 1;
       CMPIObjectPath* path = newHostPath(broker, nameSpace, remoteAccess.className, nullptr);
       if (isMissing(operation, path, "Create CMPIObjectPath failed for RemoteAccessAvailableToElement.")) return 1;
@@ -74,20 +69,20 @@ static CMPIStatus DNSRemoteAccessAvailableToElement_GetInstance(Operation operat
 static CMPIStatus DNSRemoteAccessAvailableToElement_EnumInstanceNames(Operation operation) {
   operation = enter(operation, remoteAccess.category);
   DNSClientObjFactory factory;
-  std::vector<CMPIObjectPath*> servers;
-  if (!fetchServers(operation, factory, operation.ref, servers)) {
+  const auto servers = fetchServers<CMPIObjectPath>(operation, factory, operation.ref);
+  if (!servers) {
     return fail(operation, "***Can't get DNS Server's ObjectPaths.             Exiting EnumerateInstanceNames***");
   }
   const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
-  for (CMPIObjectPath* server : counted16(servers)) {
+  for (CMPIObjectPath* server : counted16(*servers)) {
     if (isMissing(operation, server, "CMPIObjectPath is NULL for DNS Server")) return operation.status;
     setNameSpace(server, nameSpace);
-    std::vector<CMPIObjectPath*> clients;
-    if (!fetchEndpoints(operation, factory, operation.ref, clients)) {
+    const auto clients = fetchEndpoints<CMPIObjectPath>(operation, factory, operation.ref);
+    if (!clients) {
       return fail(operation,
                   "***Can't get ObjectPaths for DNSClient.                 Exiting EnumerateInstanceNames***");
     }
-    for (CMPIObjectPath* client : counted16(clients)) {
+    for (CMPIObjectPath* client : counted16(*clients)) {
       if (isMissing(operation, client, "CMPIObjectPath is NULL for DNSClient")) return operation.status;
       setNameSpace(client, nameSpace);
       if (!returnPair(operation, remoteAccess, nameSpace,
@@ -105,24 +100,26 @@ static CMPIStatus DNSRemoteAccessAvailableToElement_EnumInstanceNames(Operation 
 template <typename Found>
 static CMPIStatus associate(Operation& operation, DNSClientObjFactory& factory, const FarEnd& farEnd) {
   const std::string systemName = sourceKey(operation, "SystemName");
-  std::vector<Found*> objects;
+  std::optional<std::vector<Found*>> objects(std::in_place);
   if (farEnd.className == remoteServiceAccessPointClass) {
     if (!passesResultClass(operation.resultClass, remoteServiceAccessPointClass, "CIM_RemoteServiceAccessPoint")) {
       return operation.status;
     }
-    if (!fetchServers(operation, factory, farEnd.path, objects)) return operation.status;
+    objects = fetchServers<Found>(operation, factory, farEnd.path);
+    if (!objects) return operation.status;
   } else if (farEnd.className == dnsProtocolEndPointClass) {
     if (!passesResultClass(operation.resultClass, dnsProtocolEndPointClass, "CIM_DNSProtocolEndPoint")) {
       return operation.status;
     }
-    if (!fetchEndpoints(operation, factory, farEnd.path, objects)) {
+    objects = fetchEndpoints<Found>(operation, factory, farEnd.path);
+    if (!objects) {
       // The names do not log it.
       if (kReturnsInstances<Found>) complain(operation, "getAllDNSClientCMPIInstances Failed");
       return operation.status;
     }
   }
   const std::string nameSpace = nameSpaceForPaths<Found>(operation);
-  for (Found* object : counted16(objects)) {
+  for (Found* object : counted16(*objects)) {
     if (textIn(operation, object, "SystemName") == systemName) returnOnThisHost(operation, object, nameSpace);
   }
   return endWithoutDone(operation);
@@ -136,44 +133,25 @@ static void setEnds(const CMPIInstance* reference, const FarEnd& farEnd, const C
 }
 
 // The ends of References are instances with keys only, whose paths are taken; those of ReferenceNames are paths.
-
-static bool fetchServerEnds(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                            std::vector<CMPIInstance*>& keys) {
-  keys.reserve(factory.getNumberOfDNSServerInstances());
-  return factory.getAllDNSServerCMPIInstances(broker, path, nullptr, true, keys, &operation.status) == 0;
-}
-static bool fetchServerEnds(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                            std::vector<CMPIObjectPath*>& paths) {
-  return fetchServers(operation, factory, path, paths);
-}
-
-static bool fetchEndpointEnds(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                              std::vector<CMPIInstance*>& keys) {
-  keys.reserve(factory.getNumberOfDNSClientInstances());
-  return factory.getAllDNSClientCMPIInstances(broker, path, nullptr, true, keys, &operation.status) == 0;
-}
-static bool fetchEndpointEnds(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                              std::vector<CMPIObjectPath*>& paths) {
-  return fetchEndpoints(operation, factory, path, paths);
-}
-
 // Nothing is filtered: the source need not exist. Only the builder sets OrderOfAccess.
 template <typename Found>
 static CMPIStatus refer(Operation& operation, DNSClientObjFactory& factory, const ReferenceParts& parts) {
   const auto& [farEnd, nameSpace, association] = parts;
-  std::vector<Found*> ends;
+  std::optional<std::vector<Found*>> ends(std::in_place);
   if (farEnd.className == remoteServiceAccessPointClass) {
-    if (!fetchServerEnds(operation, factory, farEnd.path, ends)) {
+    ends = fetchServers<Found>(operation, factory, farEnd.path, true);
+    if (!ends) {
       return fail(operation,
                   either<Found>("getAllDNSServerCMPIInstances Failed", "getAllDNSServerCMPIObjPaths Failed"));
     }
   } else if (farEnd.className == dnsProtocolEndPointClass) {
-    if (!fetchEndpointEnds(operation, factory, farEnd.path, ends)) {
+    ends = fetchEndpoints<Found>(operation, factory, farEnd.path, true);
+    if (!ends) {
       return fail(operation,
                   either<Found>("getAllDNSClientCMPIInstances Failed", "getAllDNSClientCMPIObjPaths Failed"));
     }
   }
-  for (Found* found : counted16(ends)) {
+  for (Found* found : counted16(*ends)) {
     const CMPIInstance* reference = newInstance(broker, association, &operation.status);
     setEnds(reference, farEnd, operation.ref, pathOf(operation, found));
     deliverOnThisHost<Found>(operation, reference, nameSpace);

@@ -13,21 +13,18 @@ static const std::string loggerDNSRemoteSAP = "Zorvagent.DNSRemoteServiceAccessP
 static CMPIStatus DNSRemoteServiceAccessPoint_EnumInstanceNames(Operation operation) {
   operation = enter(operation, loggerDNSRemoteSAP);
   DNSClientObjFactory factory;
-  std::vector<CMPIObjectPath*> paths;
-  if (!fetchServers(operation, factory, operation.ref, paths))
-    return fail(operation, "getAllDNSServerCMPIObjPaths Failed");
-  for (const CMPIObjectPath* path : paths) returnOne(operation, path);
+  const auto paths = fetchServers<CMPIObjectPath>(operation, factory, operation.ref);
+  if (!paths) return fail(operation, "getAllDNSServerCMPIObjPaths Failed");
+  for (const CMPIObjectPath* path : *paths) returnOne(operation, path);
   return end(operation);
 }
 
 static CMPIStatus DNSRemoteServiceAccessPoint_EnumInstances(Operation operation) {
   operation = enter(operation, loggerDNSRemoteSAP);
   DNSClientObjFactory factory;
-  std::vector<CMPIInstance*> instances;
-  if (!fetchServers(operation, factory, operation.ref, instances)) {
-    return fail(operation, "getAllDNSServerCMPIInstances Failed");
-  }
-  for (const CMPIInstance* instance : instances) returnOne(operation, instance);
+  const auto instances = fetchServers<CMPIInstance>(operation, factory, operation.ref);
+  if (!instances) return fail(operation, "getAllDNSServerCMPIInstances Failed");
+  for (const CMPIInstance* instance : *instances) returnOne(operation, instance);
   return end(operation);
 }
 
@@ -47,10 +44,9 @@ static CMPIStatus DNSRemoteServiceAccessPoint_GetInstance(Operation operation) {
     }
     for (const CMPIInstance* instance : instances) returnOne(operation, instance);
   } else {  // all keys count, and every server has a name: nothing is found
-    if (!fetchServers(operation, factory, operation.ref, instances)) {
-      return fail(operation, "getAllDNSServerCMPIInstances Failed");
-    }
-    returnFirstEqual(operation, instances, false);
+    const auto all = fetchServers<CMPIInstance>(operation, factory, operation.ref);
+    if (!all) return fail(operation, "getAllDNSServerCMPIInstances Failed");
+    returnFirstEqual(operation, *all, false);
   }
   return end(operation);
 }

@@ -5,21 +5,15 @@
 // references, and the associators of a DNS endpoint, compare the first part of the IP endpoint's name, up to a "_",
 // with the DNS endpoint's name: an interface's further addresses are named that way.
 
+#include "factory/ClassNames.h"
 #include "factory/DNSClientObjFactory.h"
 #include "providers/AssociationOperation.h"
 #include "providers/ProviderFrame.h"
 
 namespace ZV {
 
-static const char* const dnsProtocolEndPointClass = "ZORVA_DNSProtocolEndPoint";
-static const char* const ipInterfaceClass = "ZORVA_IPProtocolEndpoint";
-static const Association sapDependency = {"Zorvagent.DNSSAPSAPDependencyProvider",
-                                          "ZORVA_DNSSAPSAPDependency",
-                                          "Antecedent",
-                                          "Dependent",
-                                          newHostPath,
-                                          "ZORVA_DNSSAPSAPDependency",
-                                          kNamesEachOperation};
+static const Association sapDependency = {"Zorvagent.DNSSAPSAPDependencyProvider", dnsSAPSAPDependencyClass,
+                                          kPathsOnThisHost, kAntecedentAndDependent};
 
 namespace {
 
@@ -49,13 +43,11 @@ static unsigned short DNSSAPSAPDependencyCMPIInstances(Operation operation, std:
   operation = enter(operation, sapDependency.category);
   DNSClientObjFactory factory;
   const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
-  const CMPIEnumeration* ipEndpoints = nullptr;
-  if (!askForAll<CMPIObjectPath>(operation, nameSpace, ipInterfaceClass,
-                                 "Create CMPIObjectPath failed for IpInterfaceClass.", ipEndpoints)) {
-    return 1;
-  }
-  while (hasNext(ipEndpoints, &operation.status)) {
-    const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &operation.status);
+  const auto ipEndpoints = askForAll<CMPIObjectPath>(operation, nameSpace, ipInterfaceClass,
+                                                     "Create CMPIObjectPath failed for IpInterfaceClass.");
+  if (!ipEndpoints) return 1;
+  while (hasNext(*ipEndpoints, &operation.status)) {
+    const CMPIObjectPath* ipEndpoint = nextPath(*ipEndpoints, &operation.status);
     CMPIInstance* endpoint = nullptr;
     if (!findEndpoint(operation, factory, ipEndpoint, false, endpoint)) return 1;
     if (!isGood(endpoint)) continue;
@@ -81,13 +73,11 @@ static CMPIStatus DNSSAPSAPDependency_EnumInstanceNames(Operation operation) {
   operation = enter(operation, sapDependency.category);
   DNSClientObjFactory factory;
   const std::string nameSpace = nameSpaceOf(operation.ref, &operation.status);
-  const CMPIEnumeration* ipEndpoints = nullptr;
-  if (!askForAll<CMPIObjectPath>(operation, nameSpace, ipInterfaceClass,
-                                 "Create CMPIObjectPath failed for IpInterfaceClass.", ipEndpoints)) {
-    return operation.status;
-  }
-  while (hasNext(ipEndpoints, &operation.status)) {
-    const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &operation.status);
+  const auto ipEndpoints = askForAll<CMPIObjectPath>(operation, nameSpace, ipInterfaceClass,
+                                                     "Create CMPIObjectPath failed for IpInterfaceClass.");
+  if (!ipEndpoints) return operation.status;
+  while (hasNext(*ipEndpoints, &operation.status)) {
+    const CMPIObjectPath* ipEndpoint = nextPath(*ipEndpoints, &operation.status);
     CMPIInstance* endpoint = nullptr;
     if (!findEndpoint(operation, factory, ipEndpoint, true, endpoint)) return operation.status;
     if (!isGood(endpoint)) continue;
@@ -109,14 +99,12 @@ static CMPIStatus associate(Operation& operation, DNSClientObjFactory& factory, 
   if (farEnd.className == ipInterfaceClass) {
     if (!passesResultClass(operation.resultClass, ipInterfaceClass, "CIM_IPProtocolEndPoint")) return operation.status;
     const std::string name = sourceKey(operation, "Name");
-    const CMPIEnumeration* ipEndpoints = nullptr;
-    if (!askFor<Found>(operation, farEnd.path, ipEndpoints,
-                       either<Found>("Call to CBEnumInstances of target Class Failed.",
-                                     "CBEnumInstanceNames Failed for the target Class"))) {
-      return operation.status;
-    }
-    while (hasNext(ipEndpoints, &operation.status)) {
-      Found* ipEndpoint = next<Found>(operation, ipEndpoints);
+    const auto ipEndpoints = askFor<Found>(operation, farEnd.path,
+                                           either<Found>("Call to CBEnumInstances of target Class Failed.",
+                                                         "CBEnumInstanceNames Failed for the target Class"));
+    if (!ipEndpoints) return operation.status;
+    while (hasNext(*ipEndpoints, &operation.status)) {
+      Found* ipEndpoint = next<Found>(operation, *ipEndpoints);
       if (!firstTokenEquals(textIn(operation, ipEndpoint, "Name"), name)) continue;
       returnOne(operation, ipEndpoint);
       break;  // only the first match; the references return all
@@ -141,11 +129,11 @@ template <typename Found>
 static CMPIStatus refer(Operation& operation, DNSClientObjFactory& factory, const ReferenceParts& parts) {
   const auto& [farEnd, nameSpace, association] = parts;
   if (farEnd.className == dnsProtocolEndPointClass) {
-    std::vector<CMPIObjectPath*> endpoints;
-    if (!fetchEndpoints(operation, factory, farEnd.path, endpoints)) {
+    const auto endpoints = fetchEndpoints<CMPIObjectPath>(operation, factory, farEnd.path);
+    if (!endpoints) {
       return fail(operation, "getAllDNSClientCMPIObjPaths Failed");
     }
-    for (CMPIObjectPath* endpoint : counted16(endpoints)) {
+    for (CMPIObjectPath* endpoint : counted16(*endpoints)) {
       const std::string sourceName = sourceKey(operation, "Name");
       if (!firstTokenEquals(sourceName, keyText(endpoint, "Name", &operation.status))) continue;
       const CMPIInstance* reference = newInstance(broker, association, &operation.status);
@@ -154,10 +142,10 @@ static CMPIStatus refer(Operation& operation, DNSClientObjFactory& factory, cons
       deliverOnThisHost<Found>(operation, reference, nameSpace);
     }
   } else if (farEnd.className == ipInterfaceClass) {
-    const CMPIEnumeration* ipEndpoints = nullptr;
-    if (!askFor<CMPIObjectPath>(operation, farEnd.path, ipEndpoints)) return operation.status;
-    while (hasNext(ipEndpoints, &operation.status)) {
-      const CMPIObjectPath* ipEndpoint = nextPath(ipEndpoints, &operation.status);
+    const auto ipEndpoints = askFor<CMPIObjectPath>(operation, farEnd.path);
+    if (!ipEndpoints) return operation.status;
+    while (hasNext(*ipEndpoints, &operation.status)) {
+      const CMPIObjectPath* ipEndpoint = nextPath(*ipEndpoints, &operation.status);
       const std::string ipName = keyText(ipEndpoint, "Name", &operation.status);
       if (!firstTokenEquals(ipName, sourceKey(operation, "Name"))) continue;
       const CMPIInstance* reference = newPair(operation, sapDependency, association, ipEndpoint, operation.ref);

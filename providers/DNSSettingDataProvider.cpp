@@ -13,19 +13,18 @@ static const std::string loggerDNSSettingDataProv = "Zorvagent.DNSSettingDataPro
 
 static CMPIStatus DNSSettingData_EnumInstanceNames(Operation operation) {
   operation = enter(operation, loggerDNSSettingDataProv);
-  std::vector<CMPIObjectPath*> paths;
-  if (getAllDNSSettingDataCMPIObjectPaths(broker, operation.ref, &paths, &operation.status) != 0) {
-    return fail(operation, "getAllDNSSettingDataCMPIInstances Failed");
-  }
-  returnAll(operation, paths);
+  const auto paths =
+      fetchSettings<CMPIObjectPath>(operation, operation.ref, "getAllDNSSettingDataCMPIInstances Failed");
+  if (!paths) return operation.status;
+  returnAll(operation, *paths);
   return end(operation);
 }
 
 static CMPIStatus DNSSettingData_EnumInstances(Operation operation) {
   operation = enter(operation, loggerDNSSettingDataProv);
-  std::vector<CMPIInstance*> instances;
-  if (!fetchSettings(operation, operation.ref, instances)) return operation.status;
-  returnAll(operation, instances);
+  const auto instances = fetchSettings<CMPIInstance>(operation, operation.ref);
+  if (!instances) return operation.status;
+  returnAll(operation, *instances);
   return end(operation);
 }
 

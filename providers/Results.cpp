@@ -8,56 +8,90 @@
 
 namespace ZV {
 
-bool fetchEndpoints(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                    std::vector<CMPIObjectPath*>& endpoints) {
-  endpoints.reserve(factory.getNumberOfDNSClientInstances());
-  return factory.getAllDNSClientCMPIObjPaths(operation.broker, path, endpoints, &operation.status) == 0;
+using Paths = std::vector<CMPIObjectPath*>;
+using Instances = std::vector<CMPIInstance*>;
+
+template <>
+std::optional<Paths> fetchEndpoints(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
+                                    bool) {
+  Paths paths;
+  paths.reserve(factory.getNumberOfDNSClientInstances());
+  if (factory.getAllDNSClientCMPIObjPaths(operation.broker, path, paths, &operation.status) != 0) return {};
+  return paths;
 }
 
-bool fetchEndpoints(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                    std::vector<CMPIInstance*>& endpoints) {
-  endpoints.reserve(factory.getNumberOfDNSClientInstances());
-  return factory.getAllDNSClientCMPIInstances(operation.broker, path, operation.properties, false, endpoints,
-                                              &operation.status) == 0;
+template <>
+std::optional<Instances> fetchEndpoints(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
+                                        bool keysOnly) {
+  Instances instances;
+  instances.reserve(factory.getNumberOfDNSClientInstances());
+  if (factory.getAllDNSClientCMPIInstances(operation.broker, path, operation.properties, keysOnly, instances,
+                                           &operation.status) != 0) {
+    return {};
+  }
+  return instances;
 }
 
-bool fetchServers(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                  std::vector<CMPIObjectPath*>& servers) {
-  servers.reserve(factory.getNumberOfDNSServerInstances());
-  return factory.getAllDNSServerCMPIObjPaths(operation.broker, path, servers, &operation.status) == 0;
+template <>
+std::optional<Paths> fetchServers(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
+                                  bool) {
+  Paths paths;
+  paths.reserve(factory.getNumberOfDNSServerInstances());
+  if (factory.getAllDNSServerCMPIObjPaths(operation.broker, path, paths, &operation.status) != 0) return {};
+  return paths;
 }
 
-bool fetchServers(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                  std::vector<CMPIInstance*>& servers) {
-  servers.reserve(factory.getNumberOfDNSServerInstances());
-  return factory.getAllDNSServerCMPIInstances(operation.broker, path, operation.properties, false, servers,
-                                              &operation.status) == 0;
+template <>
+std::optional<Instances> fetchServers(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
+                                      bool keysOnly) {
+  Instances instances;
+  instances.reserve(factory.getNumberOfDNSServerInstances());
+  if (factory.getAllDNSServerCMPIInstances(operation.broker, path, operation.properties, keysOnly, instances,
+                                           &operation.status) != 0) {
+    return {};
+  }
+  return instances;
 }
 
-bool fetchSettings(Operation& operation, const CMPIObjectPath* path, std::vector<CMPIObjectPath*>& settings,
-                   const Place& place) {
-  return getAllDNSSettingDataCMPIObjectPaths(operation.broker, path, &settings, &operation.status) == 0 ||
-         complain(operation, "getAllDNSSettingDataCMPIObjectPaths Failed", place);
+template <>
+std::optional<Paths> fetchSettings(Operation& operation, const CMPIObjectPath* path, const char* failed,
+                                   const Place& place) {
+  Paths paths;
+  if (getAllDNSSettingDataCMPIObjectPaths(operation.broker, path, &paths, &operation.status) == 0) return paths;
+  complain(operation, failed != nullptr ? failed : "getAllDNSSettingDataCMPIObjectPaths Failed", place);
+  return {};
 }
 
-bool fetchSettings(Operation& operation, const CMPIObjectPath* path, std::vector<CMPIInstance*>& settings,
-                   const Place& place) {
-  return getAllDNSSettingDataCMPIInstances(operation.broker, path, operation.properties, &settings,
-                                           &operation.status) == 0 ||
-         complain(operation, "getAllDNSSettingDataCMPIInstances Failed", place);
+template <>
+std::optional<Instances> fetchSettings(Operation& operation, const CMPIObjectPath* path, const char* failed,
+                                       const Place& place) {
+  Instances all;
+  if (getAllDNSSettingDataCMPIInstances(operation.broker, path, operation.properties, &all, &operation.status) == 0) {
+    return all;
+  }
+  complain(operation, failed != nullptr ? failed : "getAllDNSSettingDataCMPIInstances Failed", place);
+  return {};
 }
 
-bool fetchGeneralSettings(Operation& operation, const CMPIObjectPath* path, std::vector<CMPIObjectPath*>& settings,
-                          const Place& place) {
-  return getAllDNSGeneralSettingDataCMPIObjectPaths(operation.broker, path, &settings, &operation.status) == 0 ||
-         complain(operation, "getAllDNSGeneralSettingDataCMPIObjectPaths Failed", place);
+template <>
+std::optional<Paths> fetchGeneralSettings(Operation& operation, const CMPIObjectPath* path, const char* failed,
+                                          const Place& place) {
+  Paths paths;
+  if (getAllDNSGeneralSettingDataCMPIObjectPaths(operation.broker, path, &paths, &operation.status) == 0) return paths;
+  complain(operation, failed != nullptr ? failed : "getAllDNSGeneralSettingDataCMPIObjectPaths Failed", place);
+  return {};
 }
 
-bool fetchGeneralSettings(Operation& operation, const CMPIObjectPath* path, std::vector<CMPIInstance*>& settings,
-                          const Place& place) {
-  return getAllDNSGeneralSettingDataCMPIInstances(operation.broker, path, operation.properties, &settings,
-                                                  &operation.status) == 0 ||
-         complain(operation, "getAllDNSGeneralSettingDataCMPIInstances Failed", place);
+template <>
+std::optional<Instances> fetchGeneralSettings(Operation& operation, const CMPIObjectPath* path, const char* failed,
+                                              const Place& place) {
+  Instances all;
+  if (getAllDNSGeneralSettingDataCMPIInstances(operation.broker, path, operation.properties, &all, &operation.status) ==
+      0) {
+    return all;
+  }
+  complain(operation, failed != nullptr ? failed : "getAllDNSGeneralSettingDataCMPIInstances Failed", place);
+  return {};
 }
 
 void returnPathsOf(Operation& operation, const std::vector<CMPIInstance*>& instances) {

@@ -4,6 +4,7 @@
 
 #include <cmpidt.h>
 
+#include <optional>
 #include <vector>
 
 #include "factory/DNSClientObjFactory.h"
@@ -11,26 +12,24 @@
 
 namespace ZV {
 
-/// All endpoints or servers, with the namespace of the path; as instances they have the operation's properties. False
-/// if the factory fails.
-bool fetchEndpoints(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                    std::vector<CMPIObjectPath*>& endpoints);
-bool fetchEndpoints(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                    std::vector<CMPIInstance*>& endpoints);
-bool fetchServers(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                  std::vector<CMPIObjectPath*>& servers);
-bool fetchServers(Operation& operation, DNSClientObjFactory& factory, const CMPIObjectPath* path,
-                  std::vector<CMPIInstance*>& servers);
+/// All endpoints or servers, with the namespace of the path; none if the factory fails. Found is CMPIObjectPath, or
+/// CMPIInstance for instances with the operation's properties or with their keys only.
+template <typename Found>
+std::optional<std::vector<Found*>> fetchEndpoints(Operation& operation, DNSClientObjFactory& factory,
+                                                  const CMPIObjectPath* path, bool keysOnly = false);
+template <typename Found>
+std::optional<std::vector<Found*>> fetchServers(Operation& operation, DNSClientObjFactory& factory,
+                                                const CMPIObjectPath* path, bool keysOnly = false);
 
-/// The same for the setting data of the interfaces, and for that of the host. A failure is logged.
-bool fetchSettings(Operation& operation, const CMPIObjectPath* path, std::vector<CMPIObjectPath*>& settings,
-                   const Place& place = Place::here());
-bool fetchSettings(Operation& operation, const CMPIObjectPath* path, std::vector<CMPIInstance*>& settings,
-                   const Place& place = Place::here());
-bool fetchGeneralSettings(Operation& operation, const CMPIObjectPath* path, std::vector<CMPIObjectPath*>& settings,
-                          const Place& place = Place::here());
-bool fetchGeneralSettings(Operation& operation, const CMPIObjectPath* path, std::vector<CMPIInstance*>& settings,
-                          const Place& place = Place::here());
+/// The same for the setting data of the interfaces, and for that of the host. A failure is logged with the text, or
+/// with the name of the factory's function.
+template <typename Found>
+std::optional<std::vector<Found*>> fetchSettings(Operation& operation, const CMPIObjectPath* path,
+                                                 const char* failed = nullptr, const Place& place = Place::here());
+template <typename Found>
+std::optional<std::vector<Found*>> fetchGeneralSettings(Operation& operation, const CMPIObjectPath* path,
+                                                        const char* failed = nullptr,
+                                                        const Place& place = Place::here());
 
 /// One result: a path or an instance, null or not.
 inline void returnOne(const Operation& operation, const CMPIObjectPath* path) {
