@@ -99,6 +99,11 @@ unsigned short failBuilder(const Operation& operation, const char* text, const P
   return 1;
 }
 
+unsigned short endBuilder(const Operation& operation, const Place& place) {
+  markExit(operation, place);
+  return 0;
+}
+
 unsigned short leaveBuilder(const Operation& operation, const Place& place) {
   markExit(operation, place);
   return 1;

@@ -200,6 +200,13 @@ void setPair(const CMPIInstance* instance, const Association& association, const
 CMPIInstance* newPair(Operation& operation, const Association& association, const CMPIObjectPath* path,
                       const CMPIObjectPath* first, const CMPIObjectPath* second);
 
+/// Returns a new reference with both ends.
+template <typename Found>
+void deliverPair(Operation& operation, const Association& association, const ReferenceParts& parts,
+                 const CMPIObjectPath* first, const CMPIObjectPath* second) {
+  deliver<Found>(operation, newPair(operation, association, parts.association, first, second), parts.nameSpace);
+}
+
 /// Makes a builder's instance on this host, with the filter of the properties that the client asks for, and adds it
 /// unless the broker makes no good one; notMade is the error then. False, with noPath as an error, if its path cannot
 /// be made.
@@ -219,6 +226,9 @@ using Builder = unsigned short (*)(Operation operation, std::vector<CMPIInstance
 
 /// An error that ends a builder; always 1, its result.
 unsigned short failBuilder(const Operation& operation, const char* text, const Place& place = Place::here());
+
+/// The end of a builder that made all: the exit is logged. Always 0.
+unsigned short endBuilder(const Operation& operation, const Place& place = Place::here());
 
 /// The end of five builders if the settings cannot be fetched: only they log the exit of a failure. Always 1.
 unsigned short leaveBuilder(const Operation& operation, const Place& place = Place::here());

@@ -20,42 +20,22 @@ static const char* const setDNSSuffixSearchOrderMethod = "SetDNSSuffixSearchOrde
 static CMPIStatus DNSClient_EnumInstanceNames(Operation operation) {
   operation = enter(operation, loggerDNSClientProv);
   DNSClientObjFactory factory;
-  const auto paths = fetchEndpoints<CMPIObjectPath>(operation, factory, operation.ref);
-  if (!paths) return fail(operation, "getAllDNSClientCMPIObjPaths Failed");
-  for (const CMPIObjectPath* path : *paths) returnOne(operation, path);
-  return end(operation);
+  return endWithEach(operation, fetchEndpoints<CMPIObjectPath>(operation, factory, operation.ref),
+                     "getAllDNSClientCMPIObjPaths Failed");
 }
 
 static CMPIStatus DNSClient_EnumInstances(Operation operation) {
   operation = enter(operation, loggerDNSClientProv);
   DNSClientObjFactory factory;
-  const auto instances = fetchEndpoints<CMPIInstance>(operation, factory, operation.ref);
-  if (!instances) return fail(operation, "getAllDNSClientCMPIInstances Failed");
-  for (const CMPIInstance* instance : *instances) returnOne(operation, instance);
-  return end(operation);
+  return endWithEach(operation, fetchEndpoints<CMPIInstance>(operation, factory, operation.ref),
+                     "getAllDNSClientCMPIInstances Failed");
 }
 
 static CMPIStatus DNSClient_GetInstance(Operation operation) {
   operation = enter(operation, loggerDNSClientProv);
-  if (keyCountOf(operation.ref, &operation.status) == 0) {
-    complain(operation, "At least one key should be passed");
-    return end(operation);
-  }
-  const CMPIString* name = stringOf(getKey(operation.ref, "Name", &operation.status));
-  DNSClientObjFactory factory;
-  std::vector<CMPIInstance*> instances;
-  if (isGood(name)) {  // only the name decides; the other keys are ignored
-    if (factory.getOneDNSClientCMPIInstance(broker, operation.ref, const_cast<CMPIString*>(name), operation.properties,
-                                            instances, &operation.status) != 0) {
-      return fail(operation, "getOneDNSClientCMPIInstance Failed");
-    }
-    for (const CMPIInstance* instance : instances) returnOne(operation, instance);
-  } else {  // all keys count
-    const auto all = fetchEndpoints<CMPIInstance>(operation, factory, operation.ref);
-    if (!all) return fail(operation, "getAllDNSClientCMPIInstances Failed");
-    returnFirstEqual(operation, *all, false);
-  }
-  return end(operation);
+  return endWithNamed(operation, &DNSClientObjFactory::getOneDNSClientCMPIInstance,
+                      "getOneDNSClientCMPIInstance Failed", fetchEndpoints<CMPIInstance>,
+                      "getAllDNSClientCMPIInstances Failed");
 }
 
 static CMPIStatus DNSClient_ModifyInstance(Operation operation, const CMPIInstance* changed) {

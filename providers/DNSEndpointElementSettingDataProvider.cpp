@@ -72,8 +72,7 @@ static unsigned short DNSEndpointElementSettingDataCMPIInstances(Operation opera
       }
     }
   }
-  markExit(operation);
-  return 0;
+  return endBuilder(operation);
 }
 
 ZV_BUILT_INSTANCES(DNSEndpointElementSettingData, elementSettingData, DNSEndpointElementSettingDataCMPIInstances)
@@ -148,9 +147,7 @@ static CMPIStatus refer(Operation& operation, DNSClientObjFactory& factory, cons
     for (CMPIObjectPath* endpoint : counted16(*endpoints)) {
       if (keyText(endpoint, "Name", &operation.status) != interfaceName) continue;
       setNameSpaceAndHost(endpoint, nameSpace);
-      const CMPIInstance* reference = newInstance(broker, association, &operation.status);
-      setPair(reference, elementSettingData, endpoint, operation.ref);
-      deliver<Found>(operation, reference, nameSpace);
+      deliverPair<Found>(operation, elementSettingData, parts, endpoint, operation.ref);
     }
   }
   return end(operation);

@@ -48,8 +48,7 @@ static unsigned short DNSGenEndpointElementSettingDataCMPIInstances(Operation op
       }
     }
   }
-  markExit(operation);
-  return 0;
+  return endBuilder(operation);
 }
 
 ZV_BUILT_INSTANCES(DNSGenEndpointElementSettingData, elementSettingData, DNSGenEndpointElementSettingDataCMPIInstances)
@@ -112,18 +111,14 @@ static CMPIStatus refer(Operation& operation, DNSClientObjFactory& factory, cons
     if (!settings) return operation.status;
     for (CMPIObjectPath* setting : counted16(*settings)) {
       setNameSpaceAndHost(setting, nameSpace);
-      const CMPIInstance* reference = newInstance(broker, association, &operation.status);
-      setPair(reference, elementSettingData, operation.ref, setting);
-      deliver<Found>(operation, reference, nameSpace);
+      deliverPair<Found>(operation, elementSettingData, parts, operation.ref, setting);
     }
   } else if (farEnd.className == dnsProtocolEndPointClass) {
     const auto endpoints = fetchEndpoints<CMPIObjectPath>(operation, factory, farEnd.path);
     if (!endpoints) return operation.status;
     for (CMPIObjectPath* endpoint : counted16(*endpoints)) {
       setNameSpaceAndHost(endpoint, nameSpace);
-      const CMPIInstance* reference = newInstance(broker, association, &operation.status);
-      setPair(reference, elementSettingData, endpoint, operation.ref);
-      deliver<Found>(operation, reference, nameSpace);
+      deliverPair<Found>(operation, elementSettingData, parts, endpoint, operation.ref);
     }
   }
   return end(operation);

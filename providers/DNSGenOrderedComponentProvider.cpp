@@ -107,10 +107,8 @@ static CMPIStatus refer(Operation& operation, DNSClientObjFactory&, const Refere
     if (!assignments) return operation.status;
     while (hasNext(*assignments, &operation.status)) {
       nextPath(*assignments, &operation.status);  // only counted: each part is the far end's class without keys
-      const CMPIInstance* reference = newInstance(broker, association, &operation.status);
-      // The source is the group; the builder has them the other way round.
-      setPair(reference, orderedComponent, operation.ref, farEnd.path);
-      deliver<Found>(operation, reference, nameSpace);
+                                                  // The source is the group; the builder has them the other way round.
+      deliverPair<Found>(operation, orderedComponent, parts, operation.ref, farEnd.path);
     }
   }
   return end(operation);

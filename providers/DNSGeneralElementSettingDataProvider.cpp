@@ -45,8 +45,7 @@ static unsigned short DNSGeneralElementSettingDataCMPIInstances(Operation operat
         return 1;
     }
   }
-  markExit(operation);
-  return 0;
+  return endBuilder(operation);
 }
 
 ZV_BUILT_INSTANCES(DNSGeneralElementSettingData, elementSettingData, DNSGeneralElementSettingDataCMPIInstances)
@@ -120,9 +119,7 @@ static CMPIStatus refer(Operation& operation, DNSClientObjFactory&, const Refere
     if (!systems) return operation.status;
     while (hasNext(*systems, &operation.status)) {
       nextPath(*systems, &operation.status);  // only counted: each reference names the far end's class without keys
-      const CMPIInstance* reference = newInstance(broker, association, &operation.status);
-      setPair(reference, elementSettingData, farEnd.path, operation.ref);
-      deliver<Found>(operation, reference, nameSpace);
+      deliverPair<Found>(operation, elementSettingData, parts, farEnd.path, operation.ref);
     }
   }
   return end(operation);

@@ -13,18 +13,12 @@ static const std::string loggerDNSGeneralSettingDataProv = "Zorvagent.DNSGeneral
 
 static CMPIStatus DNSGeneralSettingData_EnumInstanceNames(Operation operation) {
   operation = enter(operation, loggerDNSGeneralSettingDataProv);
-  const auto paths = fetchGeneralSettings<CMPIObjectPath>(operation, operation.ref);
-  if (!paths) return operation.status;
-  returnAll(operation, *paths);
-  return end(operation);
+  return endWithAll(operation, fetchGeneralSettings<CMPIObjectPath>(operation, operation.ref));
 }
 
 static CMPIStatus DNSGeneralSettingData_EnumInstances(Operation operation) {
   operation = enter(operation, loggerDNSGeneralSettingDataProv);
-  const auto instances = fetchGeneralSettings<CMPIInstance>(operation, operation.ref);
-  if (!instances) return operation.status;
-  returnAll(operation, *instances);
-  return end(operation);
+  return endWithAll(operation, fetchGeneralSettings<CMPIInstance>(operation, operation.ref));
 }
 
 static CMPIStatus DNSGeneralSettingData_GetInstance(Operation operation) {

@@ -47,8 +47,7 @@ static unsigned short DNSHostedAccessPointCMPIInstances(Operation operation, std
       instances.push_back(instance);  // good or not
     }
   }
-  markExit(operation);
-  return 0;
+  return endBuilder(operation);
 }
 
 ZV_BUILT_INSTANCES(DNSHostedAccessPoint, hostedAccessPoint, DNSHostedAccessPointCMPIInstances)
@@ -146,8 +145,8 @@ static CMPIStatus refer(Operation& operation, DNSClientObjFactory& factory, cons
     while (hasNext(*systems, &operation.status)) {
       const CMPIObjectPath* system = nextPath(*systems, &operation.status);
       if (keyText(system, "Name", &operation.status) != systemName) continue;
-      const CMPIInstance* reference = newPair(operation, hostedAccessPoint, association, system, operation.ref);
-      deliverOnThisHost<Found>(operation, reference, nameSpace);
+      deliverOnThisHost<Found>(operation, newPair(operation, hostedAccessPoint, association, system, operation.ref),
+                               nameSpace);
     }
   }
   return endWithoutDone(operation);

@@ -132,9 +132,7 @@ static CMPIStatus refer(Operation& operation, DNSClientObjFactory&, const Refere
       const std::string instanceID = keyText(assignment, "InstanceID", &operation.status);
       if (!requireTarget(operation, instanceID, target)) return operation.status;
       if (target != sourceID) continue;
-      const CMPIInstance* reference = newInstance(broker, association, &operation.status);
-      setPair(reference, orderedComponent, assignment, part);
-      deliver<Found>(operation, reference, nameSpace);
+      deliverPair<Found>(operation, orderedComponent, parts, assignment, part);
     }
   }
   return end(operation);

@@ -62,8 +62,7 @@ static unsigned short DNSSAPSAPDependencyCMPIInstances(Operation operation, std:
     setPair(instance, sapDependency, ipEndpoint, endpointPath);
     instances.push_back(instance);
   }
-  markExit(operation);
-  return 0;
+  return endBuilder(operation);
 }
 
 ZV_BUILT_INSTANCES(DNSSAPSAPDependency, sapDependency, DNSSAPSAPDependencyCMPIInstances)
@@ -148,8 +147,8 @@ static CMPIStatus refer(Operation& operation, DNSClientObjFactory& factory, cons
       const CMPIObjectPath* ipEndpoint = nextPath(*ipEndpoints, &operation.status);
       const std::string ipName = keyText(ipEndpoint, "Name", &operation.status);
       if (!firstTokenEquals(ipName, sourceKey(operation, "Name"))) continue;
-      const CMPIInstance* reference = newPair(operation, sapDependency, association, ipEndpoint, operation.ref);
-      deliverOnThisHost<Found>(operation, reference, nameSpace);
+      deliverOnThisHost<Found>(operation, newPair(operation, sapDependency, association, ipEndpoint, operation.ref),
+                               nameSpace);
     }
   }
   return endWithoutDone(operation);

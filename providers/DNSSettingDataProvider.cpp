@@ -22,10 +22,7 @@ static CMPIStatus DNSSettingData_EnumInstanceNames(Operation operation) {
 
 static CMPIStatus DNSSettingData_EnumInstances(Operation operation) {
   operation = enter(operation, loggerDNSSettingDataProv);
-  const auto instances = fetchSettings<CMPIInstance>(operation, operation.ref);
-  if (!instances) return operation.status;
-  returnAll(operation, *instances);
-  return end(operation);
+  return endWithAll(operation, fetchSettings<CMPIInstance>(operation, operation.ref));
 }
 
 static CMPIStatus DNSSettingData_GetInstance(Operation operation) {

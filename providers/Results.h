@@ -52,6 +52,36 @@ void returnPathsOf(Operation& operation, const std::vector<CMPIInstance*>& insta
 /// skipped. Where the keys are references, they are compared as paths.
 void returnFirstEqual(Operation& operation, const std::vector<CMPIInstance*>& instances, bool keysAreReferences);
 
+/// The end of an enumeration: every object is returned. Without them the error is written and the operation is left
+/// open.
+template <typename Object>
+CMPIStatus endWithEach(const Operation& operation, const std::optional<std::vector<Object*>>& objects,
+                       const char* failed, const Place& place = Place::here()) {
+  if (!objects) return fail(operation, failed, place);
+  for (const Object* object : *objects) returnOne(operation, object);
+  return end(operation, place);
+}
+
+/// The same for objects that are counted in 16 bits, and whose failure is already logged.
+template <typename Object>
+CMPIStatus endWithAll(const Operation& operation, const std::optional<std::vector<Object*>>& objects,
+                      const Place& place = Place::here()) {
+  if (!objects) return operation.status;
+  returnAll(operation, *objects);
+  return end(operation, place);
+}
+
+using GetNamed = unsigned short (DNSClientObjFactory::*)(const CMPIBroker*, const CMPIObjectPath*, CMPIString* name,
+                                                         const char** properties, std::vector<CMPIInstance*>&,
+                                                         CMPIStatus*);
+using FetchInstances = std::optional<std::vector<CMPIInstance*>> (*)(Operation&, DNSClientObjFactory&,
+                                                                     const CMPIObjectPath*, bool keysOnly);
+
+/// GetInstance of an endpoint or a server. If the path has a name, only the name decides and the other keys are
+/// ignored; otherwise all keys count.
+CMPIStatus endWithNamed(Operation& operation, GetNamed getNamed, const char* noneNamed, FetchInstances fetch,
+                        const char* cannotFetch, const Place& place = Place::here());
+
 /// The end of a modification with this code: a failure is logged, and the client gets its code. No exit is logged.
 CMPIStatus endModification(Operation& operation, unsigned int rc, const Place& place = Place::here());
 
