@@ -14,13 +14,14 @@
 #include "agent/Agent.h"
 #include "broker/Broker.h"
 #include "schema/Schema.h"
+#include "util/NotCopied.h"
 
 namespace {
 
 namespace fs = std::filesystem;
 
 // A directory of this process with a configuration and a tree of interfaces, which the agent reads from then on.
-class BenchHost {
+class BenchHost : zorva::util::NotCopied {
  public:
   BenchHost() {
     std::string name = (fs::temp_directory_path() / "zorva-bench-XXXXXX").string();
@@ -29,8 +30,6 @@ class BenchHost {
     fs::create_directory(directory_ / "data");
   }
   ~BenchHost() { fs::remove_all(directory_); }
-  BenchHost(const BenchHost&) = delete;
-  BenchHost& operator=(const BenchHost&) = delete;
 
   fs::path dataFile(int interface) const { return directory_ / "data" / ("ifcfg-eth" + std::to_string(interface)); }
 

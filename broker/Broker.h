@@ -21,6 +21,7 @@
 #include "broker/objects/Value.h"
 #include "broker/requests/Operations.h"
 #include "schema/ClassRepository.h"
+#include "util/NotCopied.h"
 
 struct _CMPIBroker;
 
@@ -28,15 +29,13 @@ namespace zorva::broker {
 
 class BrokerCore;
 
-class Broker {
+class Broker : util::NotCopied {
  public:
   /// `classes` are the classes of all namespaces of the registry.
   Broker(std::shared_ptr<const schema::ClassRepository> classes, BrokerOptions options);
 
   /// Calls the providers' cleanup functions and closes their libraries. No request may be running.
   ~Broker();
-  Broker(const Broker&) = delete;
-  Broker& operator=(const Broker&) = delete;
 
   /// The instances of a class and of its served subclasses, the class itself first. CIM_ERR_NOT_SUPPORTED if no
   /// provider serves any of them. The status comes after all results; results may have come before a failure. If the

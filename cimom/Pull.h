@@ -23,6 +23,7 @@
 #include <string_view>
 
 #include "broker/objects/Value.h"
+#include "util/NotCopied.h"
 
 namespace zorva::cimom {
 
@@ -52,16 +53,15 @@ class PullTable;
 
 /// Objects of one enumeration, in order, and their share of the table's bytes, which the destructor gives back. If all
 /// bytes are taken, enumerations of clients that hold more than this one are dropped.
-class PullObjects {
+class PullObjects : util::NotCopied {
  public:
   explicit PullObjects(PullTable& table) noexcept : table_(table) {}
   ~PullObjects();
-  PullObjects(const PullObjects&) = delete;
-  PullObjects& operator=(const PullObjects&) = delete;
 
   /// False, with nothing added, if the table has no room left.
   bool add(std::string_view text);
   std::size_t size() const noexcept { return texts_.size(); }
+  std::size_t openCount() const;
   std::size_t bytes() const noexcept { return bytes_; }
   const std::deque<std::string>& texts() const noexcept { return texts_; }
   /// Moves the first `count` of them, or all, to `taken`.
@@ -73,13 +73,11 @@ class PullObjects {
   std::size_t bytes_ = 0;
 };
 
-class PullTable {
+class PullTable : util::NotCopied {
  public:
   using Clock = std::chrono::steady_clock;
 
   explicit PullTable(PullLimits limits) : limits_(limits) {}
-  PullTable(const PullTable&) = delete;
-  PullTable& operator=(const PullTable&) = delete;
 
   const PullLimits& limits() const noexcept { return limits_; }
 
@@ -103,7 +101,6 @@ class PullTable {
   /// Drops enumerations whose clients did not continue them in time. The functions above do so too.
   void reclaim(Clock::time_point now = Clock::now());
 
-  std::size_t openCount() const;
   std::size_t bytes() const noexcept { return bytes_.load(); }
 
  private:

@@ -14,6 +14,7 @@
 #include "cimom/ServiceHost.h"
 #include "cimxml/RequestReader.h"
 #include "cimxml/ResponseWriter.h"
+#include "util/NotCopied.h"
 
 namespace zorva::cimom {
 
@@ -61,7 +62,7 @@ PullLimits pullLimits(const ServiceOptions& options) {
 }
 
 /// The permission to read a large body; a small one needs none.
-class Turn {
+class Turn : util::NotCopied {
  public:
   Turn(std::binary_semaphore& turns, const http::HttpRequest& http, const http::ResponseSink& sink)
       : turns_(http.body.size() > kLargeBody ? &turns : nullptr) {
@@ -72,8 +73,6 @@ class Turn {
   ~Turn() {
     if (turns_ != nullptr) turns_->release();
   }
-  Turn(const Turn&) = delete;
-  Turn& operator=(const Turn&) = delete;
 
  private:
   std::binary_semaphore* const turns_;
@@ -132,14 +131,12 @@ std::string whoIs(const http::HttpRequest& http) {
 }
 
 /// The buffer in which this thread's responses are gathered, reused for each request.
-class Buffer {
+class Buffer : util::NotCopied {
  public:
   Buffer() = default;
   ~Buffer() {
     if (kept().capacity() > kMostKept) std::string().swap(kept());
   }
-  Buffer(const Buffer&) = delete;
-  Buffer& operator=(const Buffer&) = delete;
 
   std::string& text() noexcept { return kept(); }
 

@@ -13,6 +13,7 @@
 
 #include "broker/Broker.h"
 #include "http/Exchange.h"
+#include "util/NotCopied.h"
 
 namespace zorva::cimom {
 
@@ -39,13 +40,11 @@ struct ServiceOptions {
 
 class ServiceCore;
 
-class Service {
+class Service : util::NotCopied {
  public:
   /// `broker` outlives the service.
   explicit Service(broker::Broker& broker, ServiceOptions options = {});
   ~Service();
-  Service(const Service&) = delete;
-  Service& operator=(const Service&) = delete;
 
   /// Executes one request and writes its response. It always calls sink.begin, unless the sink throws ClientGone, the
   /// only exception that this function throws. Any number of threads may call it at once; a provider that does not

@@ -15,6 +15,7 @@
 #include <vector>
 
 #include "agent/testing/TemporaryDirectory.h"
+#include "util/NotCopied.h"
 
 namespace zorva::cimom {
 namespace {
@@ -63,7 +64,7 @@ std::string outputOf(const std::vector<std::string>& words, int& exitCode) {
 }
 
 /// zorvacimd on a free port, over the tree above; the destructor ends it.
-class Server {
+class Server : util::NotCopied {
  public:
   Server() {
     directory_.write("tree.json", kTree);
@@ -96,8 +97,6 @@ class Server {
     kill(process_, SIGTERM);
     waitpid(process_, nullptr, 0);
   }
-  Server(const Server&) = delete;
-  Server& operator=(const Server&) = delete;
 
   /// The file of the interface's settings.
   std::string file() const { return directory_ / "data/ifcfg-eth0"; }

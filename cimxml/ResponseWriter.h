@@ -12,17 +12,17 @@
 #include <string>
 #include <string_view>
 
+#include "util/NotCopied.h"
+
 namespace zorva::cimxml {
 
-class ResponseWriter {
+class ResponseWriter : util::NotCopied {
  public:
   /// Takes the next piece of the text. Its exceptions leave drainIfFull() and the functions that end something.
   using Drain = std::function<void(std::string_view)>;
 
   /// Text is gathered in `buffer`, which is cleared first, until it has `most` bytes.
   ResponseWriter(std::string& buffer, std::size_t most, Drain drain);
-  ResponseWriter(const ResponseWriter&) = delete;
-  ResponseWriter& operator=(const ResponseWriter&) = delete;
 
   void beginMessage(std::string_view id, bool isMultiple);
   /// Passes on the rest.

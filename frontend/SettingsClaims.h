@@ -11,6 +11,7 @@
 #include "agent/SettingsLock.h"
 #include "agent/tree/TreeSnapshot.h"
 #include "broker/Broker.h"
+#include "util/NotCopied.h"
 
 namespace zorva::frontend {
 
@@ -30,12 +31,10 @@ class SettingsClaims {
 
   /// The lock for a program that reads, decides and then changes; meanwhile its requests take no lock of their own. For
   /// a program with one thread. A nested Hold does nothing. Throws as zorva::agent::SettingsLock does.
-  class Hold {
+  class Hold : util::NotCopied {
    public:
     explicit Hold(const SettingsClaims& claims);
     ~Hold();
-    Hold(const Hold&) = delete;
-    Hold& operator=(const Hold&) = delete;
 
    private:
     std::shared_ptr<State> state_;  ///< null: nested

@@ -7,15 +7,15 @@
 #include <string>
 #include <string_view>
 
+#include "util/NotCopied.h"
+
 namespace zorva::http {
 
-class Gzip {
+class Gzip : util::NotCopied {
  public:
   /// Throws std::bad_alloc.
   Gzip();
   ~Gzip();
-  Gzip(const Gzip&) = delete;
-  Gzip& operator=(const Gzip&) = delete;
 
   /// Appends to `out` the compressed text that is ready so far.
   void add(std::string_view text, std::string& out) { run(text, out, Z_NO_FLUSH); }

@@ -14,10 +14,11 @@
 
 #include "http/Exchange.h"
 #include "http/HttpLimits.h"
+#include "util/NotCopied.h"
 
 namespace zorva::http {
 
-class HttpServer {
+class HttpServer : util::NotCopied {
  public:
   /// Answers a request; called on worker threads, on several at once.
   using Handler = std::function<void(const HttpRequest&, ResponseSink&)>;
@@ -29,8 +30,6 @@ class HttpServer {
 
   /// Ends all connections, and waits for handlers that have not returned.
   ~HttpServer();
-  HttpServer(const HttpServer&) = delete;
-  HttpServer& operator=(const HttpServer&) = delete;
 
   /// Takes over a connected stream socket, non-blocking and close-on-exec, and closes it in the end. If the limit on
   /// connections is reached, the connection that is idle for longest is cut off; if none is idle, the new one is

@@ -16,10 +16,11 @@
 
 #include "http/HttpExchange.h"
 #include "http/HttpLimits.h"
+#include "util/NotCopied.h"
 
 namespace zorva::http {
 
-class Workers {
+class Workers : util::NotCopied {
  public:
   using Work = std::function<void(HttpExchange&)>;
 
@@ -28,8 +29,6 @@ class Workers {
   /// Waits for all threads that are not stuck in a provider. Those must not outlive the objects that `work` uses: see
   /// drain().
   ~Workers();
-  Workers(const Workers&) = delete;
-  Workers& operator=(const Workers&) = delete;
 
   void setLimits(const HttpLimits& limits);
 

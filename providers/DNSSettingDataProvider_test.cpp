@@ -7,20 +7,19 @@
 #include <cstring>
 
 #include "providers/testing/InstanceTest.h"
+#include "util/NotCopied.h"
 
 namespace ZV::Test {
 namespace {
 
 // Counts how often a file is opened.
-class OpenCounter {
+class OpenCounter : zorva::util::NotCopied {
  public:
   // Watches closing too, because the kernel merges equal events in a row.
   explicit OpenCounter(const std::string& path) : inotify_(::inotify_init1(IN_NONBLOCK | IN_CLOEXEC)) {
     ::inotify_add_watch(inotify_, path.c_str(), IN_OPEN | IN_CLOSE);
   }
   ~OpenCounter() { ::close(inotify_); }
-  OpenCounter(const OpenCounter&) = delete;
-  OpenCounter& operator=(const OpenCounter&) = delete;
 
   int take() {
     alignas(inotify_event) std::array<char, 4096> reports;

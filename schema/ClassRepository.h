@@ -17,6 +17,7 @@
 #include "schema/Declarations.h"
 #include "util/Expected.h"
 #include "util/Names.h"
+#include "util/NotCopied.h"
 
 namespace zorva::schema {
 
@@ -40,10 +41,8 @@ struct ClassMethod : Method {
 };
 
 /// A class with all its inherited elements (DSP0004 5.1.2). Immutable.
-class Class {
+class Class : util::NotCopied {
  public:
-  Class(const Class&) = delete;
-  Class& operator=(const Class&) = delete;
   ~Class();
 
   const std::string& name() const noexcept { return name_; }
@@ -68,8 +67,8 @@ class Class {
   const ClassProperty* findProperty(std::string_view name) const noexcept;
   const ClassMethod* findMethod(std::string_view name) const noexcept;
 
-  bool isAssociation() const noexcept { return isAssociation_; }
   bool isAbstract() const noexcept { return isAbstract_; }
+  bool isAssociation() const noexcept { return isAssociation_; }
 
   /// True for the class itself and every class below `ancestor`.
   bool isA(const Class& ancestor) const noexcept;
@@ -106,12 +105,10 @@ class Class {
 };
 
 /// The classes and qualifier types of one namespace (several namespaces may share one repository).
-class ClassRepository {
+class ClassRepository : util::NotCopied {
  public:
   ClassRepository();
   ~ClassRepository();
-  ClassRepository(const ClassRepository&) = delete;
-  ClassRepository& operator=(const ClassRepository&) = delete;
 
   /// Adds a qualifier type. Refused if the name exists. `file` is used in the error.
   Expected<void, SchemaError> add(QualifierType type, std::string_view file = {});

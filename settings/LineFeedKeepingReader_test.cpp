@@ -11,6 +11,7 @@
 #include "settings/DNSGeneralSettingData.h"
 #include "settings/DNSSettingData.h"
 #include "tests/support/World.h"
+#include "util/NotCopied.h"
 
 namespace ZV {
 
@@ -95,12 +96,10 @@ TEST_F(LineFeedKeepingReader, IsOpenedForReadingAndClosedBeforeItEnds) {
 }
 
 // Inserts the log lines among the calls of the reader.
-class LogAmongCalls : private zorva::agent::LogSink {
+class LogAmongCalls : private zorva::agent::LogSink, zorva::util::NotCopied {
  public:
   LogAmongCalls() { zorva::agent::setLogSink(this); }
   ~LogAmongCalls() override { zorva::agent::setLogSink(nullptr); }
-  LogAmongCalls(const LogAmongCalls&) = delete;
-  LogAmongCalls& operator=(const LogAmongCalls&) = delete;
 
  private:
   void record(const zorva::agent::LogCall& call) override {

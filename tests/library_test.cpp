@@ -13,6 +13,7 @@
 #include <sstream>
 
 #include "tests/support/ProviderCall.h"
+#include "util/NotCopied.h"
 
 namespace ZV::Test {
 namespace {
@@ -59,14 +60,12 @@ std::vector<std::string> linesOf(const std::string& command) {
 }
 
 // A library, loaded by the constructor and unloaded by the destructor.
-class Loaded {
+class Loaded : zorva::util::NotCopied {
  public:
   Loaded() : handle_(::dlopen(kLibrary.c_str(), RTLD_NOW | RTLD_LOCAL)) {
     if (handle_ == nullptr) throw std::runtime_error(::dlerror());
   }
   ~Loaded() { EXPECT_EQ(0, ::dlclose(handle_)); }
-  Loaded(const Loaded&) = delete;
-  Loaded& operator=(const Loaded&) = delete;
 
   template <typename Function>
   Function find(const std::string& name) const {
@@ -172,7 +171,7 @@ TEST(Library, IsGoneWhenItIsUnloadedAHundredTimes) {
 }
 
 // A host of two interfaces in a file, which the agent of the loaded library reads.
-class HostInAFile {
+class HostInAFile : zorva::util::NotCopied {
  public:
   HostInAFile() {
     std::string path = (std::filesystem::temp_directory_path() / "zorva-library-XXXXXX").string();
@@ -194,8 +193,6 @@ class HostInAFile {
     std::error_code ignored;
     std::filesystem::remove_all(directory_, ignored);
   }
-  HostInAFile(const HostInAFile&) = delete;
-  HostInAFile& operator=(const HostInAFile&) = delete;
 
  private:
   std::filesystem::path directory_;

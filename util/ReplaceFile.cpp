@@ -8,6 +8,7 @@
 #include <utility>
 
 #include "util/FileError.h"
+#include "util/NotCopied.h"
 
 namespace zorva::util {
 namespace {
@@ -20,14 +21,12 @@ void writeAndSync(const FileDescriptor& file, std::string_view text, const std::
 }
 
 // Removes the temporary file if the function is left early.
-class TemporaryFile {
+class TemporaryFile : util::NotCopied {
  public:
   explicit TemporaryFile(std::string path) : path_(std::move(path)) {}
   ~TemporaryFile() {
     if (!path_.empty()) ::unlink(path_.c_str());
   }
-  TemporaryFile(const TemporaryFile&) = delete;
-  TemporaryFile& operator=(const TemporaryFile&) = delete;
 
   const std::string& path() const { return path_; }
   void keep() { path_.clear(); }

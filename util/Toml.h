@@ -12,6 +12,8 @@
 #include <string_view>
 #include <vector>
 
+#include "util/NotCopied.h"
+
 namespace zorva::util {
 
 /// what() says what is wrong.
@@ -28,13 +30,11 @@ class TomlError : public std::runtime_error {
   std::string key_;
 };
 
-class TomlDocument {
+class TomlDocument : util::NotCopied {
  public:
   /// Throws TomlError for text that is no TOML.
   explicit TomlDocument(const std::string& text);
   ~TomlDocument();
-  TomlDocument(const TomlDocument&) = delete;
-  TomlDocument& operator=(const TomlDocument&) = delete;
 
   /// Throws TomlError for anything at the top but tables and keys of these names.
   void refuseAllBut(std::initializer_list<std::string_view> names) const;
@@ -47,12 +47,10 @@ class TomlDocument {
 
 /// One table of a document, which must outlive it. A function that takes a value leaves the variable unchanged if the
 /// table, or the key in it, does not exist. All throw TomlError.
-class TomlTable {
+class TomlTable : util::NotCopied {
  public:
   TomlTable(const TomlDocument& document, std::string name);
   ~TomlTable();
-  TomlTable(const TomlTable&) = delete;
-  TomlTable& operator=(const TomlTable&) = delete;
 
   void take(const char* key, std::string& value);
   void take(const char* key, bool& value);

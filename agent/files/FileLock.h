@@ -8,12 +8,13 @@
 #include <string>
 
 #include "util/FileDescriptor.h"
+#include "util/NotCopied.h"
 
 namespace zorva::agent {
 
 /// A lock between processes, and between threads, on its own file, which is never removed. Each object has its own open
 /// file. Held until the object is destroyed.
-class FileLock {
+class FileLock : util::NotCopied {
  public:
   enum class Mode { Shared, Exclusive };
   using Deadline = std::chrono::steady_clock::time_point;
@@ -29,8 +30,6 @@ class FileLock {
   FileLock(util::FileDescriptor file, const std::string& path, Mode mode, Deadline deadline);
 
   ~FileLock();
-  FileLock(const FileLock&) = delete;
-  FileLock& operator=(const FileLock&) = delete;
 
   int descriptor() const { return file_.get(); }
 

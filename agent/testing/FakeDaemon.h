@@ -8,9 +8,11 @@
 #include <functional>
 #include <string>
 
+#include "util/NotCopied.h"
+
 namespace zorva::agent::testing {
 
-class FakeDaemon {
+class FakeDaemon : util::NotCopied {
  public:
   /// Fills the answer to a call of that method; whatever it returns below 0 makes the answer an error.
   using Answer = std::function<int(sd_bus_message* answer, const std::string& method)>;
@@ -18,8 +20,6 @@ class FakeDaemon {
   /// Runs in a process of its own. Returns when it has the name; throws std::runtime_error where it cannot.
   FakeDaemon(const std::string& busName, const Answer& answer);
   ~FakeDaemon();
-  FakeDaemon(const FakeDaemon&) = delete;
-  FakeDaemon& operator=(const FakeDaemon&) = delete;
 
  private:
   pid_t process_;

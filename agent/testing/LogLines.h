@@ -6,16 +6,15 @@
 #include <vector>
 
 #include "agent/log/LogSink.h"
+#include "util/NotCopied.h"
 
 namespace zorva::agent::testing {
 
 /// Takes the lines that the agent itself writes while this exists. One at a time.
-class LogLines : public LogSink {
+class LogLines : public LogSink, private util::NotCopied {
  public:
   LogLines() { setLogSink(this); }
   ~LogLines() override { setLogSink(nullptr); }
-  LogLines(const LogLines&) = delete;
-  LogLines& operator=(const LogLines&) = delete;
 
   void record(const LogCall&) override {}
   void recordOwn(int, const std::string& message) override { lines.push_back(message); }

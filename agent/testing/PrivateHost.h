@@ -9,6 +9,8 @@
 #include <string>
 #include <vector>
 
+#include "util/NotCopied.h"
+
 namespace zorva::agent::testing {
 
 /// Whether the kernel lets this process make private hosts. That needs root, namespaces and overlayfs.
@@ -31,13 +33,11 @@ std::string outputOf(const std::string& command);
 void writeFile(const std::string& path, const std::string& text);
 
 /// The daemons of a private host. Their output is in /run/log/<name>.
-class Daemons {
+class Daemons : util::NotCopied {
  public:
   /// Starts the message bus.
   Daemons();
   ~Daemons();
-  Daemons(const Daemons&) = delete;
-  Daemons& operator=(const Daemons&) = delete;
 
   /// "dbus-daemon", "systemd-resolved", "systemd-networkd" or "NetworkManager". Returns when it can be asked; throws
   /// std::runtime_error, with its output, where that takes over ten seconds.

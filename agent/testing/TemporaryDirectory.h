@@ -10,17 +10,17 @@
 #include <exception>
 #include <string>
 
+#include "util/NotCopied.h"
+
 namespace zorva::agent::testing {
 
 /// Made in the system's temporary directory, and removed with its contents by the destructor.
-class TemporaryDirectory {
+class TemporaryDirectory : util::NotCopied {
  public:
   TemporaryDirectory();
   /// In a directory of the caller's choice, if that exists.
   explicit TemporaryDirectory(const std::string& where);
   ~TemporaryDirectory();
-  TemporaryDirectory(const TemporaryDirectory&) = delete;
-  TemporaryDirectory& operator=(const TemporaryDirectory&) = delete;
 
   /// Ends in a slash.
   const std::string& path() const { return path_; }

@@ -23,10 +23,12 @@
 #include <thread>
 #include <vector>
 
+#include "util/NotCopied.h"
+
 namespace {
 
 /// Threads that only wake the connection of a request again.
-class Workers {
+class Workers : zorva::util::NotCopied {
  public:
   explicit Workers(int count) {
     for (int i = 0; i < count; ++i) threads_.emplace_back([this] { run(); });
@@ -35,8 +37,6 @@ class Workers {
     for (std::size_t i = 0; i < threads_.size(); ++i) submit(nullptr);
     for (std::thread& thread : threads_) thread.join();
   }
-  Workers(const Workers&) = delete;
-  Workers& operator=(const Workers&) = delete;
 
   void submit(MHD_Connection* connection) {
     {

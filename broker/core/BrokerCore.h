@@ -15,18 +15,17 @@
 #include "broker/core/ProviderRegistry.h"
 #include "broker/objects/BlockCache.h"
 #include "broker/objects/ClassTable.h"
+#include "util/NotCopied.h"
 
 namespace zorva::broker {
 
 class Scope;
 struct ContextObject;
 
-class BrokerCore {
+class BrokerCore : util::NotCopied {
  public:
   BrokerCore(std::shared_ptr<const schema::ClassRepository> classes, BrokerOptions options);
   ~BrokerCore();
-  BrokerCore(const BrokerCore&) = delete;
-  BrokerCore& operator=(const BrokerCore&) = delete;
 
   /// The core of a broker handle that a provider passes; null if the handle is not one of this program.
   static BrokerCore* of(const CMPIBroker* handle) noexcept;

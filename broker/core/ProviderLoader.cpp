@@ -10,16 +10,15 @@
 #include "broker/objects/ClassTable.h"
 #include "broker/objects/Data.h"
 #include "broker/objects/Scope.h"
+#include "util/NotCopied.h"
 
 namespace zorva::broker {
 
-struct ProviderLoader::Library {
+struct ProviderLoader::Library : private util::NotCopied {
   explicit Library(void* opened) : handle(opened) {}
   ~Library() {
     if (!stays) dlclose(handle);
   }
-  Library(const Library&) = delete;
-  Library& operator=(const Library&) = delete;
 
   void* handle;
   bool stays = false;

@@ -18,6 +18,7 @@
 #include "broker/core/BrokerOptions.h"
 #include "broker/core/ProviderRegistry.h"
 #include "broker/objects/Value.h"
+#include "util/NotCopied.h"
 
 namespace zorva::broker {
 
@@ -32,15 +33,13 @@ struct LoaderHost {
   std::function<void(const std::string& warning)> warn;  ///< does not throw
 };
 
-class ProviderLoader {
+class ProviderLoader : util::NotCopied {
  public:
   ProviderLoader(LoaderHost host, const ProviderRegistry& registry, std::string directory,
                  std::vector<LinkedFunction> linked);
 
   /// Calls the cleanup of every MI that was made, then closes the libraries, except those that ask to stay loaded.
   ~ProviderLoader();
-  ProviderLoader(const ProviderLoader&) = delete;
-  ProviderLoader& operator=(const ProviderLoader&) = delete;
 
   /// The MI for a registry entry; null on a failure, which says what is missing. A failure is not remembered: the next
   /// request tries again.

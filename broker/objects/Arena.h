@@ -13,6 +13,8 @@
 #include <type_traits>
 #include <utility>
 
+#include "util/NotCopied.h"
+
 namespace zorva::broker {
 
 class BlockCache;
@@ -31,7 +33,7 @@ struct RecentNames {
   unsigned nextText = 0;
 };
 
-class Arena {
+class Arena : util::NotCopied {
  public:
   /// Objects in this arena look up their class in `classes`, which outlives the arena. It may be null if the arena will
   /// hold neither a path nor an instance. The first block of memory has `firstBlock` bytes, later ones are larger. The
@@ -39,8 +41,6 @@ class Arena {
   explicit Arena(const ClassTable* classes, std::size_t firstBlock = 4096, BlockCache* cache = nullptr)
       : classes_(classes), cache_(cache), next_(firstBlock) {}
   ~Arena();
-  Arena(const Arena&) = delete;
-  Arena& operator=(const Arena&) = delete;
 
   const ClassTable* classes() const noexcept { return classes_; }
 

@@ -6,6 +6,8 @@
 #include <cstddef>
 #include <mutex>
 
+#include "util/NotCopied.h"
+
 namespace zorva::broker {
 
 /// The head of a block; the usable memory follows it.
@@ -14,7 +16,7 @@ struct MemoryBlock {
   std::size_t size;  ///< of the memory after the head
 };
 
-class BlockCache {
+class BlockCache : util::NotCopied {
  public:
   /// The size of the blocks that are kept.
   static constexpr std::size_t kBlock = std::size_t{256} * 1024 - sizeof(MemoryBlock);
@@ -23,8 +25,6 @@ class BlockCache {
 
   BlockCache() = default;
   ~BlockCache();
-  BlockCache(const BlockCache&) = delete;
-  BlockCache& operator=(const BlockCache&) = delete;
 
   /// A block of kBlock bytes, or null where none is kept.
   MemoryBlock* take() noexcept;

@@ -14,15 +14,14 @@
 
 #include "broker/objects/Objects.h"
 #include "schema/ClassRepository.h"
+#include "util/NotCopied.h"
 
 namespace zorva::broker {
 
 /// A class as the broker's objects see it. Immutable, except for statistics of its use.
-class ClassInfo {
+class ClassInfo : util::NotCopied {
  public:
   explicit ClassInfo(const schema::Class& declared);
-  ClassInfo(const ClassInfo&) = delete;
-  ClassInfo& operator=(const ClassInfo&) = delete;
 
   const schema::Class& declared() const noexcept { return declared_; }
   const std::string& name() const noexcept { return declared_.name(); }

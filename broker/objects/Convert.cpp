@@ -6,6 +6,7 @@
 #include "broker/objects/Data.h"
 #include "broker/objects/Numbers.h"
 #include "broker/objects/PathText.h"
+#include "util/NotCopied.h"
 
 namespace zorva::broker {
 
@@ -320,12 +321,10 @@ class ScalarMaker {
 
 thread_local int nesting = 0;
 
-class Nesting {
+class Nesting : util::NotCopied {
  public:
   Nesting() noexcept { ++nesting; }
   ~Nesting() { --nesting; }
-  Nesting(const Nesting&) = delete;
-  Nesting& operator=(const Nesting&) = delete;
 };
 
 Status ScalarMaker::makeReference(const ObjectPath& path, PathObject*& object) {

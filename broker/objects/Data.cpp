@@ -4,6 +4,7 @@
 #include <cstring>
 
 #include "broker/objects/ClassTable.h"
+#include "util/NotCopied.h"
 
 namespace zorva::broker {
 
@@ -14,12 +15,10 @@ constexpr int kDeepest = 16;
 
 thread_local int adoptionDepth = 0;
 
-class AdoptionLevel {
+class AdoptionLevel : util::NotCopied {
  public:
   AdoptionLevel() noexcept { ++adoptionDepth; }
   ~AdoptionLevel() { --adoptionDepth; }
-  AdoptionLevel(const AdoptionLevel&) = delete;
-  AdoptionLevel& operator=(const AdoptionLevel&) = delete;
   bool tooDeep() const noexcept { return adoptionDepth > kDeepest; }
 };
 

@@ -17,6 +17,7 @@
 #include <string_view>
 
 #include "broker/objects/Arena.h"
+#include "util/NotCopied.h"
 
 namespace zorva::schema {
 struct ClassProperty;
@@ -26,15 +27,13 @@ namespace zorva::broker {
 
 class ClassInfo;
 
-struct StringObject : CMPIString {
+struct StringObject : CMPIString, private util::NotCopied {
   using Handle = CMPIString;
   static CMPIStringFT table;
 
   /// `text` is ended by a NUL and lives as long as the object.
   StringObject(Arena* owner, std::string_view text) noexcept
       : CMPIString{this, &table}, arena(owner), chars(text.data()), length(text.size()) {}
-  StringObject(const StringObject&) = delete;
-  StringObject& operator=(const StringObject&) = delete;
 
   static StringObject* make(Arena& arena, std::string_view text);
   std::string_view view() const noexcept { return {chars, length}; }
@@ -60,13 +59,11 @@ struct PropertyInfo {
   bool takesInstance;  ///< declared as a string with EmbeddedInstance or EmbeddedObject
 };
 
-struct ArrayObject : CMPIArray {
+struct ArrayObject : CMPIArray, private util::NotCopied {
   using Handle = CMPIArray;
   static CMPIArrayFT table;
 
   ArrayObject(Arena& owner, CMPIType elementType, CMPICount size);
-  ArrayObject(const ArrayObject&) = delete;
-  ArrayObject& operator=(const ArrayObject&) = delete;
 
   Arena* arena;
   CMPIType type;  ///< of the elements; CMPI_string also if it was made for CMPI_chars
@@ -75,7 +72,7 @@ struct ArrayObject : CMPIArray {
 };
 
 /// A point in time or an interval (DSP0004 5.2.4).
-struct DateTimeObject : CMPIDateTime {
+struct DateTimeObject : CMPIDateTime, private util::NotCopied {
   using Handle = CMPIDateTime;
   static CMPIDateTimeFT table;
 
@@ -85,8 +82,6 @@ struct DateTimeObject : CMPIDateTime {
         text(as25Characters),
         microseconds(asMicroseconds),
         interval(isInterval) {}
-  DateTimeObject(const DateTimeObject&) = delete;
-  DateTimeObject& operator=(const DateTimeObject&) = delete;
 
   /// Null if `text` is no date-time.
   static DateTimeObject* make(Arena& arena, std::string_view text);
@@ -129,7 +124,7 @@ class EntryList {
   mutable bool shared_ = false;  ///< another list may have the same entries
 };
 
-struct PathObject : CMPIObjectPath {
+struct PathObject : CMPIObjectPath, private util::NotCopied {
   using Handle = CMPIObjectPath;
   static CMPIObjectPathFT table;
 
@@ -139,8 +134,6 @@ struct PathObject : CMPIObjectPath {
         nameSpace(&emptyString()),
         host(&emptyString()),
         className(&emptyString()) {}
-  PathObject(const PathObject&) = delete;
-  PathObject& operator=(const PathObject&) = delete;
 
   static PathObject* make(Arena& arena, std::string_view nameSpace, std::string_view className);
 
@@ -158,7 +151,7 @@ struct PathObject : CMPIObjectPath {
   EntryList keys;
 };
 
-struct InstanceObject : CMPIInstance {
+struct InstanceObject : CMPIInstance, private util::NotCopied {
   using Handle = CMPIInstance;
   static CMPIInstanceFT table;
 
@@ -170,8 +163,6 @@ struct InstanceObject : CMPIInstance {
 
   InstanceObject(Arena& owner, const ClassInfo& known) noexcept
       : CMPIInstance{this, &table}, arena(&owner), info(&known), nameSpace(&emptyString()), host(&emptyString()) {}
-  InstanceObject(const InstanceObject&) = delete;
-  InstanceObject& operator=(const InstanceObject&) = delete;
 
   /// An instance of the path's class, in its namespace, with its keys as properties. The schema must have the class.
   static InstanceObject* make(Arena& arena, const PathObject& path);
@@ -197,27 +188,23 @@ struct InstanceObject : CMPIInstance {
   const EntryList* looseKeys = nullptr;  ///< if the class has no key properties: the keys of the path it was made from
 };
 
-struct ArgsObject : CMPIArgs {
+struct ArgsObject : CMPIArgs, private util::NotCopied {
   using Handle = CMPIArgs;
   static CMPIArgsFT table;
 
   explicit ArgsObject(Arena& owner) noexcept : CMPIArgs{this, &table}, arena(&owner) {}
-  ArgsObject(const ArgsObject&) = delete;
-  ArgsObject& operator=(const ArgsObject&) = delete;
 
   Arena* arena;
   EntryList list;
 };
 
 /// The result of an enumerating up-call.
-struct EnumerationObject : CMPIEnumeration {
+struct EnumerationObject : CMPIEnumeration, private util::NotCopied {
   using Handle = CMPIEnumeration;
   static CMPIEnumerationFT table;
 
   EnumerationObject(Arena& owner, CMPIType elementType) noexcept
       : CMPIEnumeration{this, &table}, arena(&owner), type(elementType) {}
-  EnumerationObject(const EnumerationObject&) = delete;
-  EnumerationObject& operator=(const EnumerationObject&) = delete;
 
   /// `data` lives in this object's arena.
   void append(const CMPIData& data);
@@ -230,13 +217,11 @@ struct EnumerationObject : CMPIEnumeration {
   std::uint32_t position = 0;  ///< of the next element
 };
 
-struct ContextObject : CMPIContext {
+struct ContextObject : CMPIContext, private util::NotCopied {
   using Handle = CMPIContext;
   static CMPIContextFT table;
 
   explicit ContextObject(Arena& owner) noexcept : CMPIContext{this, &table}, arena(&owner) {}
-  ContextObject(const ContextObject&) = delete;
-  ContextObject& operator=(const ContextObject&) = delete;
 
   void setText(const char* name, std::string_view text);
   void setFlags(CMPIFlags flags);
@@ -246,13 +231,11 @@ struct ContextObject : CMPIContext {
 };
 
 /// An error as the class CIM_Error describes it.
-struct ErrorObject : CMPIError {
+struct ErrorObject : CMPIError, private util::NotCopied {
   using Handle = CMPIError;
   static CMPIErrorFT table;
 
   explicit ErrorObject(Arena& owner) noexcept : CMPIError{this, &table}, arena(&owner) {}
-  ErrorObject(const ErrorObject&) = delete;
-  ErrorObject& operator=(const ErrorObject&) = delete;
 
   /// All members that are neither texts nor arrays.
   struct Codes {

@@ -14,20 +14,19 @@
 #include <vector>
 
 #include "broker/objects/Arena.h"
+#include "util/NotCopied.h"
 
 namespace zorva::broker {
 
 class BlockCache;
 class ClassTable;
 
-class Scope {
+class Scope : util::NotCopied {
  public:
   /// Opens a scope on this thread, for objects of these classes. It must be closed on the same thread, inner scopes
   /// first. `blocks` gives the memory.
   Scope(const ClassTable& classes, BlockCache& blocks);
   ~Scope();
-  Scope(const Scope&) = delete;
-  Scope& operator=(const Scope&) = delete;
 
   /// The innermost scope of this thread, or null.
   static Scope* current() noexcept;

@@ -5,18 +5,17 @@
 
 #include "broker/core/BrokerOptions.h"
 #include "broker/objects/Scope.h"
+#include "util/NotCopied.h"
 
 namespace zorva::broker {
 
 /// A claim of a request, and its mark in the request's scope. The scope outlives it.
-class HeldClaim {
+class HeldClaim : util::NotCopied {
  public:
   HeldClaim(Scope& scope, std::unique_ptr<Claim> claim) : scope_(scope), claim_(std::move(claim)) {
     scope_.setClaimed(true);
   }
   ~HeldClaim() { scope_.setClaimed(false); }
-  HeldClaim(const HeldClaim&) = delete;
-  HeldClaim& operator=(const HeldClaim&) = delete;
 
   /// The final status of a request that ended with this one: a failure that its provider did not notice takes
   /// precedence.

@@ -8,6 +8,7 @@
 #include "broker/objects/Data.h"
 #include "broker/objects/PathText.h"
 #include "broker/requests/Modification.h"
+#include "util/NotCopied.h"
 
 namespace zorva::broker {
 
@@ -41,12 +42,10 @@ class Outcome {
 };
 
 /// Frees what a provider made for one of several classes before the next one is asked.
-class MarkGuard {
+class MarkGuard : util::NotCopied {
  public:
   explicit MarkGuard(Scope& scope) : scope_(scope), mark_(scope.mark()) {}
   ~MarkGuard() { scope_.release(mark_); }
-  MarkGuard(const MarkGuard&) = delete;
-  MarkGuard& operator=(const MarkGuard&) = delete;
 
  private:
   Scope& scope_;

@@ -15,6 +15,7 @@
 #include "broker/requests/Result.h"
 #include "broker/requests/ResultFilter.h"
 #include "util/Expected.h"
+#include "util/NotCopied.h"
 
 namespace zorva::broker {
 
@@ -29,11 +30,9 @@ struct FarEnd {
 /// Instances or names: the two forms of most read operations.
 enum class Form { Instances, Paths };
 
-class Request {
+class Request : util::NotCopied {
  public:
   explicit Request(BrokerCore& core);
-  Request(const Request&) = delete;
-  Request& operator=(const Request&) = delete;
 
   Scope& scope() noexcept { return scope_; }
   Arena& arena() noexcept { return scope_.arena(); }

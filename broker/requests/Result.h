@@ -24,7 +24,7 @@ class Receiver {
 };
 
 /// Lives on the stack of the request. Providers may fill it from several threads; calls are serialized.
-struct ResultObject : CMPIResult {
+struct ResultObject : CMPIResult, private util::NotCopied {
   using Handle = CMPIResult;
   static constexpr CMPIResultFT& table = resultTable;
 
@@ -34,8 +34,6 @@ struct ResultObject : CMPIResult {
   /// `taker` may be null if nothing is accepted. `provider` names it in log lines.
   ResultObject(BrokerCore& broker, unsigned accepted, Receiver* taker, std::string provider)
       : CMPIResult{this, &table}, core(broker), accepts(accepted), receiver(taker), who(std::move(provider)) {}
-  ResultObject(const ResultObject&) = delete;
-  ResultObject& operator=(const ResultObject&) = delete;
 
   /// Logs that something was dropped.
   void drop(std::string_view what) const;

@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "cli/session/Globals.h"
+#include "util/NotCopied.h"
 
 namespace CLI {
 class App;
@@ -98,12 +99,10 @@ class Subcommand {
   CLI::App& app_;
 };
 
-class CommandLine {
+class CommandLine : util::NotCopied {
  public:
   CommandLine();
   ~CommandLine();
-  CommandLine(const CommandLine&) = delete;
-  CommandLine& operator=(const CommandLine&) = delete;
 
   /// Registers a subcommand. Help lists them in this order.
   Subcommand add(const std::string& name, const std::string& description);

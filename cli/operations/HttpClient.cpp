@@ -8,6 +8,7 @@
 #include "cli/output/Failure.h"
 #include "cli/output/Text.h"
 #include "util/Names.h"
+#include "util/NotCopied.h"
 #include "util/Text.h"
 
 namespace zorva::cli {
@@ -40,11 +41,9 @@ std::size_t takeField(char* data, std::size_t size, std::size_t count, void* rep
 }  // namespace
 
 /// The used functions of libcurl, and a transfer.
-struct HttpClient::Curl {
+struct HttpClient::Curl : private util::NotCopied {
   Curl();
   ~Curl();
-  Curl(const Curl&) = delete;
-  Curl& operator=(const Curl&) = delete;
 
   template <typename Function>
   void find(Function& function, const char* name) {

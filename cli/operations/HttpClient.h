@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "cli/operations/ServerUrl.h"
+#include "util/NotCopied.h"
 
 namespace zorva::cli {
 
@@ -23,13 +24,11 @@ struct HttpReply {
 };
 
 /// One server, over connections that are kept open. Used by one thread.
-class HttpClient {
+class HttpClient : util::NotCopied {
  public:
   /// Throws Failure if libcurl cannot be loaded.
   explicit HttpClient(const ServerUrl& server);
   ~HttpClient();
-  HttpClient(const HttpClient&) = delete;
-  HttpClient& operator=(const HttpClient&) = delete;
 
   /// Sends `body` and waits for the whole reply: ten seconds for the connection, and two minutes for each further byte.
   /// `fields` are lines like "CIMOperation: MethodCall". Does not follow redirections or use proxies. Throws Failure if

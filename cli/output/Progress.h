@@ -6,16 +6,16 @@
 #include <string>
 #include <thread>
 
+#include "util/NotCopied.h"
+
 namespace zorva::cli {
 
 /// A line on standard error that says what a long command is doing: only on a terminal, only after half a second, and
 /// erased at the end. One at a time.
-class Progress {
+class Progress : util::NotCopied {
  public:
   Progress();
   ~Progress();
-  Progress(const Progress&) = delete;
-  Progress& operator=(const Progress&) = delete;
 
   /// The current step: "counting ZORVA_DNSSettingData".
   void step(std::string what);

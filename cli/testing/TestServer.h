@@ -11,17 +11,17 @@
 #include <thread>
 #include <vector>
 
+#include "util/NotCopied.h"
+
 namespace zorva::cli {
 
 class TestHost;
 
 /// zorvacimd, which serves a test host on its own port while this object lives.
-class TestServer {
+class TestServer : util::NotCopied {
  public:
   explicit TestServer(const TestHost& host);
   ~TestServer();
-  TestServer(const TestServer&) = delete;
-  TestServer& operator=(const TestServer&) = delete;
 
   /// "http://127.0.0.1:40000"; empty if it did not start.
   const std::string& url() const { return url_; }
@@ -32,7 +32,7 @@ class TestServer {
 };
 
 /// A server that sends what a test says. Each connection takes one request.
-class ScriptedServer {
+class ScriptedServer : util::NotCopied {
  public:
   /// Returns the whole text of the HTTP reply to a request; nothing: there are no more.
   using Answer = std::function<std::optional<std::string>(const std::string& request)>;
@@ -41,8 +41,6 @@ class ScriptedServer {
   /// These replies, one for each request, independent of its text; none after the last of them.
   explicit ScriptedServer(std::vector<std::string> replies);
   ~ScriptedServer();
-  ScriptedServer(const ScriptedServer&) = delete;
-  ScriptedServer& operator=(const ScriptedServer&) = delete;
 
   std::string url() const;
 

@@ -13,6 +13,7 @@
 #include "agent/testing/TemporaryDirectory.h"
 #include "http/Listener.h"
 #include "util/FileDescriptor.h"
+#include "util/NotCopied.h"
 
 namespace zorva::server::testing {
 
@@ -23,15 +24,13 @@ struct DaemonOutcome {
   std::string err;
 };
 
-class TestDaemon {
+class TestDaemon : util::NotCopied {
  public:
   /// `config` is the text of zorvacimd.toml; the log is a file. Listens on port 0 of 127.0.0.1, unless `arguments` say
   /// otherwise. `prepare` runs in the child before the program. Waits until the server prints its address.
   explicit TestDaemon(const std::string& config = {}, std::vector<std::string> arguments = {},
                       const std::function<void()>& prepare = {});
   ~TestDaemon();
-  TestDaemon(const TestDaemon&) = delete;
-  TestDaemon& operator=(const TestDaemon&) = delete;
 
   int port() const { return port_; }
   pid_t process() const { return process_; }

@@ -7,18 +7,17 @@
 
 #include "agent/Seams.h"
 #include "tests/support/World.h"
+#include "util/NotCopied.h"
 
 namespace ZV::Test {
 
 /// The contents of a file at each log line.
-class FileAtEachLine : private zorva::agent::LogSink {
+class FileAtEachLine : private zorva::agent::LogSink, zorva::util::NotCopied {
  public:
   FileAtEachLine(const World& world, std::string interface) : world_(world), interface_(std::move(interface)) {
     zorva::agent::setLogSink(this);
   }
   ~FileAtEachLine() override { zorva::agent::setLogSink(nullptr); }
-  FileAtEachLine(const FileAtEachLine&) = delete;
-  FileAtEachLine& operator=(const FileAtEachLine&) = delete;
 
   std::vector<std::optional<std::string>> contents;
 

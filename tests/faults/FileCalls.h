@@ -9,6 +9,8 @@
 #include <string>
 #include <vector>
 
+#include "util/NotCopied.h"
+
 namespace ZV::Test {
 
 enum class FileCall {
@@ -41,12 +43,10 @@ inline constexpr FileFault kAllFileFaults[] = {FileFault::Refused, FileFault::Ha
 const char* nameOf(FileFault fault);
 
 /// Makes the n-th call from now on fail, counted from 1, or only counts calls if n is 0. One at a time, on one thread.
-class FailingFiles {
+class FailingFiles : zorva::util::NotCopied {
  public:
   explicit FailingFiles(std::size_t n = 0, FileFault fault = FileFault::Refused);
   ~FailingFiles();
-  FailingFiles(const FailingFiles&) = delete;
-  FailingFiles& operator=(const FailingFiles&) = delete;
 
   const std::vector<FileCall>& calls() const { return calls_; }
   bool wasReached() const { return n_ != 0 && calls_.size() >= n_; }

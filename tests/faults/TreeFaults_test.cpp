@@ -5,6 +5,7 @@
 #include "FaultTest.h"
 #include "agent/Seams.h"
 #include "tests/support/Places.h"
+#include "util/NotCopied.h"
 
 namespace ZV::Test {
 namespace {
@@ -12,12 +13,10 @@ namespace {
 using zorva::agent::TreeCall;
 
 // Records each call of the tree with its place among the log lines.
-class TreeCalls : private zorva::agent::TreeCallHook {
+class TreeCalls : private zorva::agent::TreeCallHook, zorva::util::NotCopied {
  public:
   TreeCalls() { zorva::agent::setTreeCallHook(this); }
   ~TreeCalls() override { zorva::agent::setTreeCallHook(nullptr); }
-  TreeCalls(const TreeCalls&) = delete;
-  TreeCalls& operator=(const TreeCalls&) = delete;
 
   struct Placed {
     TreeCall call;

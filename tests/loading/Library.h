@@ -7,16 +7,15 @@
 
 #include "agent/testing/TemporaryDirectory.h"
 #include "tests/support/ProviderCall.h"
+#include "util/NotCopied.h"
 
 namespace ZV::Test {
 
 /// A shared library, loaded by the constructor and unloaded by the destructor. mode is RTLD_LOCAL or RTLD_GLOBAL.
-class Library {
+class Library : zorva::util::NotCopied {
  public:
   explicit Library(const std::string& path, int mode);
   ~Library();
-  Library(const Library&) = delete;
-  Library& operator=(const Library&) = delete;
 
   /// The library's own function of that name; throws std::runtime_error if it has none.
   template <typename Function>
@@ -41,12 +40,10 @@ struct ProviderNames {
 const std::vector<ProviderNames>& allProviderNames();
 
 /// A host of two interfaces in a document, which the agent reads as long as this object lives.
-class DocumentHost {
+class DocumentHost : zorva::util::NotCopied {
  public:
   DocumentHost();
   ~DocumentHost();
-  DocumentHost(const DocumentHost&) = delete;
-  DocumentHost& operator=(const DocumentHost&) = delete;
 
  private:
   zorva::agent::testing::TemporaryDirectory directory_;

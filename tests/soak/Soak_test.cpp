@@ -21,6 +21,7 @@
 #include "agent/testing/NetworkNamespace.h"
 #include "agent/testing/TemporaryDirectory.h"
 #include "schema/Schema.h"
+#include "util/NotCopied.h"
 
 namespace ZV::Test {
 namespace {
@@ -42,7 +43,7 @@ seconds duration() {
 }
 
 // A host that changes, with its data directory and the agent's configuration.
-class ChangingHost {
+class ChangingHost : zorva::util::NotCopied {
  public:
   explicit ChangingHost(const std::string& source) {
     directory_.write("agent.toml", "[agent]\ndata_dir = \"" + directory_.path() + "\"\n[tree]\nsource = \"" + source +
@@ -50,8 +51,6 @@ class ChangingHost {
     ::setenv("ZORVAGENT_CONFIG", (directory_ / "agent.toml").c_str(), 1);
   }
   virtual ~ChangingHost() { ::unsetenv("ZORVAGENT_CONFIG"); }
-  ChangingHost(const ChangingHost&) = delete;
-  ChangingHost& operator=(const ChangingHost&) = delete;
 
   // Changes the interfaces; called repeatedly by one thread.
   virtual void changeInterfaces(unsigned int step) = 0;

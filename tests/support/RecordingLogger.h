@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "agent/log/LogSink.h"
+#include "util/NotCopied.h"
 
 namespace ZV::Test {
 
@@ -86,12 +87,10 @@ class LogLines : public std::vector<LogLine> {
 };
 
 /// Receives the agent's log from construction to destruction; one at a time. Safe from several threads.
-class RecordingLogger : private zorva::agent::LogSink {
+class RecordingLogger : private zorva::agent::LogSink, zorva::util::NotCopied {
  public:
   RecordingLogger();
   ~RecordingLogger() override;
-  RecordingLogger(const RecordingLogger&) = delete;
-  RecordingLogger& operator=(const RecordingLogger&) = delete;
 
   /// The active one, or null.
   static RecordingLogger* active();

@@ -13,6 +13,7 @@
 
 #include "agent/Seams.h"
 #include "agent/tree/TreeSnapshot.h"
+#include "util/NotCopied.h"
 
 namespace ZV::Test {
 
@@ -56,13 +57,11 @@ NicProperties usualNic();
 ///
 /// The destructor resets the agent, except for an active RecordingLogger, and removes the data directory. One at a
 /// time.
-class World {
+class World : zorva::util::NotCopied {
  public:
   /// A host without nodes, named host1, with an empty data directory.
   World();
   ~World();
-  World(const World&) = delete;
-  World& operator=(const World&) = delete;
 
   /// A system's node; interfaces that are added after it belong to it. host also names the managed system.
   World& host(const std::string& name = "host1", const std::string& description = "Computer");
@@ -115,12 +114,10 @@ enum class Thrown { StdException, Int };
 
 /// Makes one call of the tree's cursors fail, the n-th from now on, counted from 1, or only counts them if n is 0. One
 /// at a time.
-class FailingTree : private zorva::agent::TreeCallHook {
+class FailingTree : private zorva::agent::TreeCallHook, zorva::util::NotCopied {
  public:
   explicit FailingTree(std::size_t n = 0, Thrown thrown = Thrown::StdException);
   ~FailingTree() override;
-  FailingTree(const FailingTree&) = delete;
-  FailingTree& operator=(const FailingTree&) = delete;
 
   std::size_t callCount() const { return calls().size(); }
   std::vector<zorva::agent::TreeCall> calls() const;
