@@ -7,17 +7,11 @@ namespace zorva::broker {
 namespace {
 
 CMPICount getSize(const CMPIArray* handle, CMPIStatus* status) {
-  const ArrayObject* self = own<ArrayObject>(handle);
-  if (self == nullptr) return badHandle<CMPICount>(status);
-  setStatus(status, CMPI_RC_OK);
-  return self->count;
+  return readFrom<CMPICount>(own<ArrayObject>(handle), status, &ArrayObject::count);
 }
 
 CMPIType getSimpleType(const CMPIArray* handle, CMPIStatus* status) {
-  const ArrayObject* self = own<ArrayObject>(handle);
-  if (self == nullptr) return badHandle<CMPIType>(status);
-  setStatus(status, CMPI_RC_OK);
-  return self->type;
+  return readFrom<CMPIType>(own<ArrayObject>(handle), status, &ArrayObject::type);
 }
 
 CMPIData getElementAt(const CMPIArray* handle, CMPICount index, CMPIStatus* status) {
@@ -46,11 +40,8 @@ CMPIStatus setElementAt(CMPIArray* handle, CMPICount index, const CMPIValue* val
 
 }  // namespace
 
-CMPIArrayFT ArrayObject::table = {
-    kTableVersion,         releaseObject<ArrayObject>, guarded<cloneObject<ArrayObject, copyArray>>,
-    guarded<getSize>,      guarded<getSimpleType>,     guarded<getElementAt>,
-    guarded<setElementAt>,
-};
+CMPIArrayFT ArrayObject::table =
+    objectTable<ArrayObject, copyArray, getSize, getSimpleType, getElementAt, setElementAt>();
 
 ArrayObject::ArrayObject(Arena& owner, CMPIType elementType, CMPICount size)
     : CMPIArray{this, &table},

@@ -10,36 +10,22 @@ namespace {
 DateTimeObject* copyOfDateTime(Arena& arena, const DateTimeObject& dateTime) { return copyDateTime(arena, dateTime); }
 
 CMPIUint64 getBinaryFormat(const CMPIDateTime* handle, CMPIStatus* status) {
-  const DateTimeObject* self = own<DateTimeObject>(handle);
-  if (self == nullptr) return badHandle<CMPIUint64>(status);
-  setStatus(status, CMPI_RC_OK);
-  return self->microseconds;
+  return readFrom<CMPIUint64>(own<DateTimeObject>(handle), status, &DateTimeObject::microseconds);
 }
 
 CMPIString* getStringFormat(const CMPIDateTime* handle, CMPIStatus* status) {
-  const DateTimeObject* self = own<DateTimeObject>(handle);
-  if (self == nullptr) return badHandle<CMPIString*>(status);
-  setStatus(status, CMPI_RC_OK);
-  return self->text;
+  return readFrom<CMPIString*>(own<DateTimeObject>(handle), status, &DateTimeObject::text);
 }
 
 CMPIBoolean isInterval(const CMPIDateTime* handle, CMPIStatus* status) {
-  const DateTimeObject* self = own<DateTimeObject>(handle);
-  if (self == nullptr) return badHandle<CMPIBoolean>(status);
-  setStatus(status, CMPI_RC_OK);
-  return self->interval ? 1 : 0;
+  return readFrom<CMPIBoolean>(own<DateTimeObject>(handle), status,
+                               [](const DateTimeObject& self) { return self.interval ? 1 : 0; });
 }
 
 }  // namespace
 
-CMPIDateTimeFT DateTimeObject::table = {
-    kTableVersion,
-    releaseObject<DateTimeObject>,
-    guarded<cloneObject<DateTimeObject, copyOfDateTime>>,
-    guarded<getBinaryFormat>,
-    guarded<getStringFormat>,
-    guarded<isInterval>,
-};
+CMPIDateTimeFT DateTimeObject::table =
+    objectTable<DateTimeObject, copyOfDateTime, getBinaryFormat, getStringFormat, isInterval>();
 
 DateTimeObject* DateTimeObject::make(Arena& arena, std::string_view text) {
   const std::optional<DateTimeValue> value = parseDateTime(text);

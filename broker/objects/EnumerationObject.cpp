@@ -28,10 +28,8 @@ CMPIData getNext(const CMPIEnumeration* handle, CMPIStatus* status) {
 }
 
 CMPIBoolean hasNext(const CMPIEnumeration* handle, CMPIStatus* status) {
-  const EnumerationObject* self = own<EnumerationObject>(handle);
-  if (self == nullptr) return badHandle<CMPIBoolean>(status);
-  setStatus(status, CMPI_RC_OK);
-  return self->position < self->count ? 1 : 0;
+  return readFrom<CMPIBoolean>(own<EnumerationObject>(handle), status,
+                               [](const EnumerationObject& self) { return self.position < self.count ? 1 : 0; });
 }
 
 // All elements, including those that getNext returned; the enumeration does not change.
@@ -47,14 +45,8 @@ CMPIArray* toArray(const CMPIEnumeration* handle, CMPIStatus* status) {
 
 }  // namespace
 
-CMPIEnumerationFT EnumerationObject::table = {
-    kTableVersion,
-    releaseObject<EnumerationObject>,
-    guarded<cloneObject<EnumerationObject, copyEnumeration>>,
-    guarded<getNext>,
-    guarded<hasNext>,
-    guarded<toArray>,
-};
+CMPIEnumerationFT EnumerationObject::table =
+    objectTable<EnumerationObject, copyEnumeration, getNext, hasNext, toArray>();
 
 void EnumerationObject::append(const CMPIData& data) {
   if (count == capacity) {

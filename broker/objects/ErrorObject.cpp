@@ -36,18 +36,12 @@ auto getCode(const CMPIError* handle, CMPIStatus* status) {
 
 template <StringObject* ErrorObject::*member>
 CMPIString* getText(const CMPIError* handle, CMPIStatus* status) {
-  const ErrorObject* self = own<ErrorObject>(handle);
-  if (self == nullptr) return badHandle<CMPIString*>(status);
-  setStatus(status, CMPI_RC_OK);
-  return self->*member;
+  return readFrom<CMPIString*>(own<ErrorObject>(handle), status, member);
 }
 
 template <ArrayObject* ErrorObject::*member>
 CMPIArray* getArray(const CMPIError* handle, CMPIStatus* status) {
-  const ErrorObject* self = own<ErrorObject>(handle);
-  if (self == nullptr) return badHandle<CMPIArray*>(status);
-  setStatus(status, CMPI_RC_OK);
-  return self->*member;
+  return readFrom<CMPIArray*>(own<ErrorObject>(handle), status, member);
 }
 
 template <StringObject* ErrorObject::*member>
@@ -68,17 +62,11 @@ CMPIStatus setTextArray(CMPIError* handle, ArrayObject* ErrorObject::*member, co
 }
 
 CMPIStatus setErrorType(CMPIError* handle, const CMPIErrorType type) {
-  ErrorObject* self = own<ErrorObject>(handle);
-  if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
-  self->codes.type = type;
-  return {CMPI_RC_OK, nullptr};
+  return change(own<ErrorObject>(handle), [&](ErrorObject& self) { self.codes.type = type; });
 }
 
 CMPIStatus setErrorSourceFormat(CMPIError* handle, const CMPIErrorSrcFormat format) {
-  ErrorObject* self = own<ErrorObject>(handle);
-  if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
-  self->codes.sourceFormat = format;
-  return {CMPI_RC_OK, nullptr};
+  return change(own<ErrorObject>(handle), [&](ErrorObject& self) { self.codes.sourceFormat = format; });
 }
 
 CMPIStatus setRecommendedActions(CMPIError* handle, const CMPIArray* actions) {
@@ -91,34 +79,16 @@ CMPIStatus setMessageArguments(CMPIError* handle, CMPIArray* arguments) {
 
 }  // namespace
 
-CMPIErrorFT ErrorObject::table = {
-    kTableVersion,
-    releaseObject<ErrorObject>,
-    guarded<cloneObject<ErrorObject, copyError>>,
-    guarded<getCode<&ErrorObject::Codes::type>>,
-    guarded<getText<&ErrorObject::otherType>>,
-    guarded<getText<&ErrorObject::owningEntity>>,
-    guarded<getText<&ErrorObject::messageId>>,
-    guarded<getText<&ErrorObject::message>>,
-    guarded<getCode<&ErrorObject::Codes::severity>>,
-    guarded<getCode<&ErrorObject::Codes::cause>>,
-    guarded<getText<&ErrorObject::causeDescription>>,
-    guarded<getArray<&ErrorObject::actions>>,
-    guarded<getText<&ErrorObject::source>>,
-    guarded<getCode<&ErrorObject::Codes::sourceFormat>>,
-    guarded<getText<&ErrorObject::otherSourceFormat>>,
-    guarded<getCode<&ErrorObject::Codes::status>>,
-    guarded<getText<&ErrorObject::statusDescription>>,
-    guarded<getArray<&ErrorObject::arguments>>,
-    guarded<setErrorType>,
-    guarded<setText<&ErrorObject::otherType>>,
-    guarded<setText<&ErrorObject::causeDescription>>,
-    guarded<setRecommendedActions>,
-    guarded<setText<&ErrorObject::source>>,
-    guarded<setErrorSourceFormat>,
-    guarded<setText<&ErrorObject::otherSourceFormat>>,
-    guarded<setText<&ErrorObject::statusDescription>>,
-    guarded<setMessageArguments>,
-};
+CMPIErrorFT ErrorObject::table =
+    objectTable<ErrorObject, copyError, getCode<&ErrorObject::Codes::type>, getText<&ErrorObject::otherType>,
+                getText<&ErrorObject::owningEntity>, getText<&ErrorObject::messageId>, getText<&ErrorObject::message>,
+                getCode<&ErrorObject::Codes::severity>, getCode<&ErrorObject::Codes::cause>,
+                getText<&ErrorObject::causeDescription>, getArray<&ErrorObject::actions>, getText<&ErrorObject::source>,
+                getCode<&ErrorObject::Codes::sourceFormat>, getText<&ErrorObject::otherSourceFormat>,
+                getCode<&ErrorObject::Codes::status>, getText<&ErrorObject::statusDescription>,
+                getArray<&ErrorObject::arguments>, setErrorType, setText<&ErrorObject::otherType>,
+                setText<&ErrorObject::causeDescription>, setRecommendedActions, setText<&ErrorObject::source>,
+                setErrorSourceFormat, setText<&ErrorObject::otherSourceFormat>,
+                setText<&ErrorObject::statusDescription>, setMessageArguments>();
 
 }  // namespace zorva::broker

@@ -14,10 +14,7 @@ CMPIData getProperty(const CMPIInstance* handle, const char* name, CMPIStatus* s
   const InstanceObject* self = own<InstanceObject>(handle);
   if (self == nullptr) return badHandle<CMPIData>(status);
   const PropertyInfo* property = name != nullptr ? self->info->find(name) : nullptr;
-  if (property == nullptr) {
-    setStatus(status, CMPI_RC_ERR_NO_SUCH_PROPERTY);
-    return nullData(CMPI_null, CMPI_notFound | CMPI_nullValue);
-  }
+  if (property == nullptr) return notFound(status, CMPI_RC_ERR_NO_SUCH_PROPERTY);
   setStatus(status, CMPI_RC_OK);
   const InstanceObject::Slot* slot = self->find(*property);
   return slot != nullptr ? slot->data : nullData(property->type);
@@ -27,20 +24,14 @@ CMPIData getPropertyAt(const CMPIInstance* handle, CMPICount index, CMPIString**
   if (name != nullptr) *name = nullptr;
   const InstanceObject* self = own<InstanceObject>(handle);
   if (self == nullptr) return badHandle<CMPIData>(status);
-  if (index >= self->count) {
-    setStatus(status, CMPI_RC_ERR_NO_SUCH_PROPERTY);
-    return nullData(CMPI_null, CMPI_notFound | CMPI_nullValue);
-  }
+  if (index >= self->count) return notFound(status, CMPI_RC_ERR_NO_SUCH_PROPERTY);
   if (name != nullptr) *name = self->slots[index].property->name;
   setStatus(status, CMPI_RC_OK);
   return self->slots[index].data;
 }
 
 CMPICount getPropertyCount(const CMPIInstance* handle, CMPIStatus* status) {
-  const InstanceObject* self = own<InstanceObject>(handle);
-  if (self == nullptr) return badHandle<CMPICount>(status);
-  setStatus(status, CMPI_RC_OK);
-  return self->count;
+  return readFrom<CMPICount>(own<InstanceObject>(handle), status, &InstanceObject::count);
 }
 
 CMPIStatus setProperty(const CMPIInstance* handle, const char* name, const CMPIValue* value, CMPIType type) {
@@ -122,12 +113,9 @@ CMPIStatus setPropertyWithOrigin(const CMPIInstance* handle, const char* name, c
 
 }  // namespace
 
-CMPIInstanceFT InstanceObject::table = {
-    kTableVersion,          releaseObject<InstanceObject>,  guarded<cloneObject<InstanceObject, copyInstance>>,
-    guarded<getProperty>,   guarded<getPropertyAt>,         guarded<getPropertyCount>,
-    guarded<setProperty>,   guarded<getObjectPath>,         guarded<setPropertyFilter>,
-    guarded<setObjectPath>, guarded<setPropertyWithOrigin>,
-};
+CMPIInstanceFT InstanceObject::table =
+    objectTable<InstanceObject, copyInstance, getProperty, getPropertyAt, getPropertyCount, setProperty, getObjectPath,
+                setPropertyFilter, setObjectPath, setPropertyWithOrigin>();
 
 InstanceObject* InstanceObject::make(Arena& arena, const PathObject& path) {
   auto* instance = arena.make<InstanceObject>(arena, *path.info);

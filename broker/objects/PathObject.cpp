@@ -11,54 +11,35 @@ namespace zorva::broker {
 namespace {
 
 CMPIStatus setNamespaceText(CMPIObjectPath* handle, const char* name) {
-  PathObject* self = own<PathObject>(handle);
-  if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
-  self->setNameSpace(name != nullptr ? name : "");
-  return {CMPI_RC_OK, nullptr};
+  return change(own<PathObject>(handle), [&](PathObject& self) { self.setNameSpace(name != nullptr ? name : ""); });
 }
 
 CMPIString* getNameSpace(const CMPIObjectPath* handle, CMPIStatus* status) {
-  const PathObject* self = own<PathObject>(handle);
-  if (self == nullptr) return badHandle<CMPIString*>(status);
-  setStatus(status, CMPI_RC_OK);
-  return self->nameSpace;
+  return readFrom<CMPIString*>(own<PathObject>(handle), status, &PathObject::nameSpace);
 }
 
 CMPIStatus setHostname(CMPIObjectPath* handle, const char* name) {
-  PathObject* self = own<PathObject>(handle);
-  if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
-  self->setHost(name != nullptr ? name : "");
-  return {CMPI_RC_OK, nullptr};
+  return change(own<PathObject>(handle), [&](PathObject& self) { self.setHost(name != nullptr ? name : ""); });
 }
 
 CMPIString* getHostname(const CMPIObjectPath* handle, CMPIStatus* status) {
-  const PathObject* self = own<PathObject>(handle);
-  if (self == nullptr) return badHandle<CMPIString*>(status);
-  setStatus(status, CMPI_RC_OK);
-  return self->host;
+  return readFrom<CMPIString*>(own<PathObject>(handle), status, &PathObject::host);
 }
 
 CMPIStatus setClassName(CMPIObjectPath* handle, const char* name) {
-  PathObject* self = own<PathObject>(handle);
-  if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
-  self->setClass(name != nullptr ? name : "");
-  return {CMPI_RC_OK, nullptr};
+  return change(own<PathObject>(handle), [&](PathObject& self) { self.setClass(name != nullptr ? name : ""); });
 }
 
 CMPIString* getClassName(const CMPIObjectPath* handle, CMPIStatus* status) {
-  const PathObject* self = own<PathObject>(handle);
-  if (self == nullptr) return badHandle<CMPIString*>(status);
-  setStatus(status, CMPI_RC_OK);
-  return self->className;
+  return readFrom<CMPIString*>(own<PathObject>(handle), status, &PathObject::className);
 }
 
 CMPIStatus addKey(CMPIObjectPath* handle, const char* name, const CMPIValue* value, CMPIType type) {
   PathObject* self = own<PathObject>(handle);
   if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
-  if (name == nullptr || *name == '\0') return statusOf(CMPI_RC_ERR_INVALID_PARAMETER, "a key without a name");
   CMPIData data;
-  const CMPIrc rc = importData(*self->arena, value, type, data);
-  if (rc != CMPI_RC_OK) return {rc, nullptr};
+  const CMPIStatus status = importEntry(*self->arena, name, value, type, data, "a key without a name");
+  if (status.rc != CMPI_RC_OK) return status;
   // A key that the class lacks is kept: the receiver of the path checks it.
   const PropertyInfo* known = self->info != nullptr ? self->info->findKey(self->keys.size(), name) : nullptr;
   if (known != nullptr && fitData(*known, data) != CMPI_RC_OK) {
@@ -68,41 +49,27 @@ CMPIStatus addKey(CMPIObjectPath* handle, const char* name, const CMPIValue* val
   return {CMPI_RC_OK, nullptr};
 }
 
+// Marks a datum that was found.
 CMPIData asKey(CMPIData data) noexcept {
-  data.state = static_cast<CMPIValueState>(data.state | CMPI_keyValue);
+  if ((data.state & CMPI_notFound) == 0) data.state = static_cast<CMPIValueState>(data.state | CMPI_keyValue);
   return data;
 }
 
 CMPIData getKey(const CMPIObjectPath* handle, const char* name, CMPIStatus* status) {
   const PathObject* self = own<PathObject>(handle);
   if (self == nullptr) return badHandle<CMPIData>(status);
-  const EntryList::Entry* key = name != nullptr ? self->keys.find(name) : nullptr;
-  if (key == nullptr) {
-    setStatus(status, CMPI_RC_ERR_NOT_FOUND);
-    return nullData(CMPI_null, CMPI_notFound | CMPI_nullValue);
-  }
-  setStatus(status, CMPI_RC_OK);
-  return asKey(key->data);
+  return asKey(entryIn(self->keys, name, status));
 }
 
 CMPIData getKeyAt(const CMPIObjectPath* handle, CMPICount index, CMPIString** name, CMPIStatus* status) {
   if (name != nullptr) *name = nullptr;
   const PathObject* self = own<PathObject>(handle);
   if (self == nullptr) return badHandle<CMPIData>(status);
-  if (index >= self->keys.size()) {
-    setStatus(status, CMPI_RC_ERR_NOT_FOUND);
-    return nullData(CMPI_null, CMPI_notFound | CMPI_nullValue);
-  }
-  if (name != nullptr) *name = self->keys[index].name;
-  setStatus(status, CMPI_RC_OK);
-  return asKey(self->keys[index].data);
+  return asKey(entryIn(self->keys, index, name, status));
 }
 
 CMPICount getKeyCount(const CMPIObjectPath* handle, CMPIStatus* status) {
-  const PathObject* self = own<PathObject>(handle);
-  if (self == nullptr) return badHandle<CMPICount>(status);
-  setStatus(status, CMPI_RC_OK);
-  return self->keys.size();
+  return readFrom<CMPICount>(own<PathObject>(handle), status, [](const PathObject& self) { return self.keys.size(); });
 }
 
 CMPIStatus setNameSpaceFromObjectPath(CMPIObjectPath* handle, const CMPIObjectPath* source) {
@@ -158,28 +125,11 @@ CMPIString* toString(const CMPIObjectPath* handle, CMPIStatus* status) {
 
 }  // namespace
 
-CMPIObjectPathFT PathObject::table = {
-    kTableVersion,
-    releaseObject<PathObject>,
-    guarded<cloneObject<PathObject, copyPath>>,
-    guarded<setNamespaceText>,
-    guarded<getNameSpace>,
-    guarded<setHostname>,
-    guarded<getHostname>,
-    guarded<setClassName>,
-    guarded<getClassName>,
-    guarded<addKey>,
-    guarded<getKey>,
-    guarded<getKeyAt>,
-    guarded<getKeyCount>,
-    guarded<setNameSpaceFromObjectPath>,
-    guarded<setHostAndNameSpaceFromObjectPath>,
-    guarded<getClassQualifier>,
-    guarded<getPropertyQualifier>,
-    guarded<getMethodQualifier>,
-    guarded<getParameterQualifier>,
-    guarded<toString>,
-};
+CMPIObjectPathFT PathObject::table =
+    objectTable<PathObject, copyPath, setNamespaceText, getNameSpace, setHostname, getHostname, setClassName,
+                getClassName, addKey, getKey, getKeyAt, getKeyCount, setNameSpaceFromObjectPath,
+                setHostAndNameSpaceFromObjectPath, getClassQualifier, getPropertyQualifier, getMethodQualifier,
+                getParameterQualifier, toString>();
 
 PathObject* PathObject::make(Arena& arena, std::string_view nameSpace, std::string_view className) {
   auto* path = arena.make<PathObject>(arena);

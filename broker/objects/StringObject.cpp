@@ -13,20 +13,12 @@ namespace {
 StringObject* copyOfString(Arena& arena, const StringObject& text) { return StringObject::make(arena, text.view()); }
 
 const char* getCharPtr(const CMPIString* handle, CMPIStatus* status) {
-  const StringObject* self = own<StringObject>(handle);
-  if (self == nullptr) return badHandle<const char*>(status);
-  setStatus(status, CMPI_RC_OK);
-  return self->chars;
+  return readFrom<const char*>(own<StringObject>(handle), status, &StringObject::chars);
 }
 
 }  // namespace
 
-CMPIStringFT StringObject::table = {
-    kTableVersion,
-    releaseObject<StringObject>,
-    guarded<cloneObject<StringObject, copyOfString>>,
-    guarded<getCharPtr>,
-};
+CMPIStringFT StringObject::table = objectTable<StringObject, copyOfString, getCharPtr>();
 
 StringObject* StringObject::make(Arena& arena, std::string_view text) {
   // Object and characters are one piece of memory.

@@ -32,36 +32,31 @@ CMPIStatus give(ResultObject& self, Take take) {
   }
 }
 
-CMPIStatus returnInstance(const CMPIResult* handle, const CMPIInstance* instance) {
+// Takes an object that a provider returns, which `read` brings into the request; `what` names it in the log.
+template <typename Object, typename Read>
+CMPIStatus takeReturned(const CMPIResult* handle, ResultObject::Accepts kind, const std::string& what,
+                        const typename Object::Handle* returned, Read read, bool (Receiver::*take)(const Object&)) {
   ResultObject* self = own<ResultObject>(handle);
   if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
-  if ((self->accepts & ResultObject::Instances) == 0) {
-    self->drop("an instance where the operation returns none");
+  if ((self->accepts & kind) == 0) {
+    self->drop("an " + what + " where the operation returns none");
     return {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
   }
   Arena* arena = currentArena();
-  const InstanceObject* object = arena != nullptr ? readInstance(*arena, instance) : own<InstanceObject>(instance);
+  const Object* object = arena != nullptr ? read(*arena, returned) : own<Object>(returned);
   if (object == nullptr) {
-    self->drop(instance == nullptr ? "a null instance" : "an instance that cannot be read");
+    self->drop(returned == nullptr ? "a null " + what : "an " + what + " that cannot be read");
     return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
   }
-  return give(*self, [&] { return self->receiver->takeInstance(*object); });
+  return give(*self, [&] { return (self->receiver->*take)(*object); });
+}
+
+CMPIStatus returnInstance(const CMPIResult* handle, const CMPIInstance* instance) {
+  return takeReturned(handle, ResultObject::Instances, "instance", instance, readInstance, &Receiver::takeInstance);
 }
 
 CMPIStatus returnObjectPath(const CMPIResult* handle, const CMPIObjectPath* path) {
-  ResultObject* self = own<ResultObject>(handle);
-  if (self == nullptr) return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
-  if ((self->accepts & ResultObject::Paths) == 0) {
-    self->drop("an object path where the operation returns none");
-    return {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
-  }
-  Arena* arena = currentArena();
-  const PathObject* object = arena != nullptr ? readPath(*arena, path) : own<PathObject>(path);
-  if (object == nullptr) {
-    self->drop(path == nullptr ? "a null object path" : "an object path that cannot be read");
-    return {CMPI_RC_ERR_INVALID_HANDLE, nullptr};
-  }
-  return give(*self, [&] { return self->receiver->takePath(*object); });
+  return takeReturned(handle, ResultObject::Paths, "object path", path, readPath, &Receiver::takePath);
 }
 
 CMPIStatus returnData(const CMPIResult* handle, const CMPIValue* value, const CMPIType type) {
