@@ -18,4 +18,12 @@ CMPIObjectPath* newHostPath(const CMPIBroker* broker, const std::string& nameSpa
   return path;
 }
 
+CMPIInstance* newHostInstance(const CMPIBroker* broker, const std::string& nameSpace, const char* className,
+                              const char** properties, bool keysOnly, const std::vector<const char*>& keys) {
+  const CMPIObjectPath* path = newHostPath(broker, nameSpace, className, nullptr);
+  CMPIInstance* instance = newInstance(broker, path, nullptr);
+  if (!keysOnly) setPropertyFilter(instance, properties, keys);
+  return instance;
+}
+
 }  // namespace ZV

@@ -96,13 +96,12 @@ CMPIInstance* DNSClientObjFactory::makeDNSClientInstance(const CMPIBroker* broke
                      " properties=", properties, " isObjPath=", isObjPath, " rc=", rc);
   const WantedProperties wanted(properties, isObjPath);
 
-  const CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, rc), dnsProtocolEndPointClass, nullptr);
-  CMPIInstance* instance = newInstance(broker, path, nullptr);
+  CMPIInstance* instance =
+      newHostInstance(broker, nameSpaceOf(ref, rc), dnsProtocolEndPointClass, properties, isObjPath, kSystemKeys);
   if (!isGood(instance)) {
     flow.exit();
     return instance;
   }
-  if (!isObjPath) setPropertyFilter(instance, properties, kSystemKeys);
 
   setKeys(instance, dc);
   if (wanted("Caption")) setText(instance, "Caption", localised(L"MSGID_DNS_CLIENT_CAPTION"));
@@ -191,10 +190,9 @@ CMPIInstance* DNSClientObjFactory::makeDNSServerInstance(const CMPIBroker* broke
                      " properties=", properties, " isObjPath=", isObjPath, " rc=", rc);
   const WantedProperties wanted(properties, isObjPath);
 
-  const CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, rc), remoteServiceAccessPointClass, nullptr);
-  CMPIInstance* instance = newInstance(broker, path, nullptr);
+  CMPIInstance* instance =
+      newHostInstance(broker, nameSpaceOf(ref, rc), remoteServiceAccessPointClass, properties, isObjPath, kSystemKeys);
   if (!isGood(instance)) return instance;
-  if (!isObjPath) setPropertyFilter(instance, properties, kSystemKeys);
 
   setText(instance, "SystemCreationClassName", computerSystemClass);
   setText(instance, "CreationClassName", remoteServiceAccessPointClass);

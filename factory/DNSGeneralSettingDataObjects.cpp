@@ -62,10 +62,9 @@ CMPIInstance* makeDNSGeneralSettingDataInstance(const CMPIBroker* broker, const 
                      " properties=", properties, " isObjPath=", isObjPath, " status=", status);
   const WantedProperties wanted(properties, isObjPath);
 
-  const CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, nullptr), dnsGeneralSettingDataClass, nullptr);
-  CMPIInstance* instance = newInstance(broker, path, nullptr);
+  CMPIInstance* instance = newHostInstance(broker, nameSpaceOf(ref, nullptr), dnsGeneralSettingDataClass, properties,
+                                           isObjPath, {"InstanceID"});
   if (!isGood(instance)) return instance;
-  if (!isObjPath) setPropertyFilter(instance, properties, {"InstanceID"});
 
   setText(instance, "InstanceID", generalInstanceID());
   setTextIfWanted(instance, wanted, "Caption", data, &DNSGeneralSettingData::getCaption);

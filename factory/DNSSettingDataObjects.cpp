@@ -76,10 +76,9 @@ CMPIInstance* makeDNSSettingDataInstance(const CMPIBroker* broker, const CMPIObj
                      " properties=", properties, " isObjPath=", isObjPath, " status=", status);
   const WantedProperties wanted(properties, isObjPath);
 
-  const CMPIObjectPath* path = newHostPath(broker, nameSpaceOf(ref, nullptr), dnsSettingDataClass, nullptr);
-  CMPIInstance* instance = newInstance(broker, path, nullptr);
+  CMPIInstance* instance =
+      newHostInstance(broker, nameSpaceOf(ref, nullptr), dnsSettingDataClass, properties, isObjPath, {"InstanceID"});
   if (!isGood(instance)) return instance;
-  if (!isObjPath) setPropertyFilter(instance, properties, {"InstanceID"});
 
   setPlainProperties(instance, wanted, data);
   const char* function = static_cast<const char*>(__func__);

@@ -7,6 +7,7 @@
 #include <type_traits>
 #include <vector>
 
+#include "factory/ClassNames.h"
 #include "factory/DNSClientObjFactory.h"
 #include "providers/Operation.h"
 #include "providers/Results.h"
@@ -217,6 +218,16 @@ bool addBuilt(Operation& operation, const Association& association, const std::s
 /// Returns a path on this host with both references as keys. False, with the text as an error, if it cannot be made.
 bool returnPair(Operation& operation, const Association& association, const std::string& nameSpace, const char* noPath,
                 const CMPIObjectPath* first, const CMPIObjectPath* second, const Place& place = Place::here());
+
+/// Returns the setting data of the host to a request that accepts it. False, with an error if it cannot be fetched, for
+/// an operation that ends with it.
+template <typename Found>
+bool returnGeneralSettings(Operation& operation, const Place& place = Place::here()) {
+  if (!passesResultClass(operation.resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) return false;
+  const auto settings = fetchGeneralSettings<Found>(operation, operation.ref, nullptr, place);
+  if (settings) returnAll(operation, *settings);
+  return settings.has_value();
+}
 
 // --- What is built.
 

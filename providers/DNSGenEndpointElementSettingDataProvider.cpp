@@ -93,12 +93,7 @@ static CMPIStatus associate(Operation& operation, DNSClientObjFactory& factory, 
     const std::string nameSpace = nameSpaceForPaths<Found>(operation);
     for (Found* endpoint : counted16(*endpoints)) returnOnThisHost(operation, endpoint, nameSpace);
   } else if (farEnd.className == dnsGeneralSettingDataClass) {
-    if (!passesResultClass(operation.resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) {
-      return operation.status;
-    }
-    const auto settings = fetchGeneralSettings<Found>(operation, operation.ref);
-    if (!settings) return operation.status;
-    returnAll(operation, *settings);
+    if (!returnGeneralSettings<Found>(operation)) return operation.status;
   }
   return end(operation);
 }

@@ -92,12 +92,7 @@ static CMPIStatus associate(Operation& operation, DNSClientObjFactory&, const Fa
     if (!systems) return operation.status;
     while (hasNext(*systems, &operation.status)) returnOne(operation, next<Found>(operation, *systems));
   } else if (farEnd.className == dnsGeneralSettingDataClass) {
-    if (!passesResultClass(operation.resultClass, dnsGeneralSettingDataClass, "CIM_DNSGeneralSettingData")) {
-      return operation.status;
-    }
-    const auto settings = fetchGeneralSettings<Found>(operation, operation.ref);
-    if (!settings) return operation.status;
-    returnAll(operation, *settings);
+    if (!returnGeneralSettings<Found>(operation)) return operation.status;
   }
   return end(operation);
 }
