@@ -51,10 +51,6 @@ std::shared_ptr<const TreeSnapshot> currentTree() { return Runtime::instance().l
 
 std::string treeToJson(const TreeSnapshot& tree) { return formatJson(treeToJsonValue(tree)); }
 
-std::shared_ptr<const TreeSnapshot> treeFromJson(const std::string& text, const std::string& name) {
-  return treeFromJsonValue(parseJson(text, name), name);
-}
-
 void setLogLevel(LogStream stream, int level) { setStreamLevel(stream, level); }
 
 void setLogTarget(LogStream stream, const std::string& target) { setStreamTarget(stream, target); }

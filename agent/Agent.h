@@ -37,9 +37,6 @@ ZORVA_AGENT_API std::shared_ptr<const TreeSnapshot> currentTree();
 /// are written as characters of a private plane, U+10EE00 plus the byte, and so are the bytes of such characters.
 ZORVA_AGENT_API std::string treeToJson(const TreeSnapshot& tree);
 
-/// The tree of a JSON document; name is the document's name in errors. Throws ConfigError.
-ZORVA_AGENT_API std::shared_ptr<const TreeSnapshot> treeFromJson(const std::string& text, const std::string& name);
-
 /// Sets the level of a stream. From now on, lines below it are dropped.
 ZORVA_AGENT_API void setLogLevel(LogStream stream, int level);
 

@@ -19,6 +19,7 @@
 #include "agent/interface/Instrumentation.h"
 #include "agent/interface/PlatformUtilities.h"
 #include "agent/testing/TemporaryDirectory.h"
+#include "agent/testing/Trees.h"
 
 namespace zorva::agent {
 namespace {
@@ -73,9 +74,9 @@ TEST_F(AgentTest, TheSystemNameIsTheConfiguredOne) {
 
 TEST_F(AgentTest, TheSystemNameIsElseThatOfTheTree) {
   setConfig(Config());
-  setTreeSource(std::make_shared<FixedSource>(treeNamed("from the tree")));
+  setTreeSource(std::make_shared<testing::FixedSource>(treeNamed("from the tree")));
   EXPECT_EQ(getSystemName(), "from the tree");
-  setTreeSource(std::make_shared<FixedSource>(treeNamed("")));
+  setTreeSource(std::make_shared<testing::FixedSource>(treeNamed("")));
   EXPECT_EQ(getSystemName(), kernelName()) << "a tree without a name";
 }
 
@@ -145,11 +146,11 @@ TEST_F(AgentTest, AWrongTreeFileIsTellingAndIsReadAgainWhenItIsMended) {
 }
 
 TEST_F(AgentTest, NothingIsReadAgainWhileNothingChanges) {
-  struct Counting : FixedSource {
+  struct Counting : testing::FixedSource {
     using FixedSource::FixedSource;
     std::shared_ptr<const TreeSnapshot> read() override {
       ++reads;
-      return FixedSource::read();
+      return testing::FixedSource::read();
     }
     int reads = 0;
   };

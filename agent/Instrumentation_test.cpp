@@ -9,6 +9,7 @@
 #include "agent/Seams.h"
 #include "agent/interface/PlatformUtilities.h"
 #include "agent/testing/TemporaryDirectory.h"
+#include "agent/testing/Trees.h"
 
 namespace {
 
@@ -40,7 +41,8 @@ class InstrumentationTest : public ::testing::Test {
   ~InstrumentationTest() override { zorva::agent::reset(); }
 
   static void install(const std::string& json) {
-    zorva::agent::setTreeSource(std::make_shared<zorva::agent::FixedSource>(zorva::agent::treeFromJson(json, "tree")));
+    zorva::agent::setTreeSource(
+        std::make_shared<zorva::agent::testing::FixedSource>(zorva::agent::testing::treeFromJson(json, "tree")));
   }
 
   static std::string nameAt(const Instrumentation& cursor) {

@@ -184,11 +184,6 @@ void PullTable::reclaim(Clock::time_point now) {
   dropOld(now);
 }
 
-std::size_t PullTable::openCount() const {
-  const std::lock_guard lock(mutex_);
-  return open_.size();
-}
-
 void PullTable::dropOld(Clock::time_point now) {
   std::erase_if(open_, [now](const auto& entry) { return entry.second.deadline <= now; });
 }

@@ -61,7 +61,6 @@ class PullObjects : util::NotCopied {
   /// False, with nothing added, if the table has no room left.
   bool add(std::string_view text);
   std::size_t size() const noexcept { return texts_.size(); }
-  std::size_t openCount() const;
   std::size_t bytes() const noexcept { return bytes_; }
   const std::deque<std::string>& texts() const noexcept { return texts_; }
   /// Moves the first `count` of them, or all, to `taken`.

@@ -67,7 +67,6 @@ class Class : util::NotCopied {
   const ClassProperty* findProperty(std::string_view name) const noexcept;
   const ClassMethod* findMethod(std::string_view name) const noexcept;
 
-  bool isAbstract() const noexcept { return isAbstract_; }
   bool isAssociation() const noexcept { return isAssociation_; }
 
   /// True for the class itself and every class below `ancestor`.

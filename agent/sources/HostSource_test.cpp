@@ -18,6 +18,7 @@
 #include "agent/interface/Instrumentation.h"
 #include "agent/testing/NetworkNamespace.h"
 #include "agent/testing/TemporaryDirectory.h"
+#include "agent/testing/Trees.h"
 
 namespace zorva::agent {
 namespace {
@@ -324,7 +325,7 @@ TEST(HostNetwork, NamesOfFifteenBytesOfAnythingThatTheKernelTakesAreNodes) {
     for (int byte = 1; byte < 256; ++byte) names.emplace_back(15, static_cast<char>(byte));
     const std::vector<std::string> taken = addAll(interfaces, names);
     const auto tree = source.read();
-    const auto back = treeFromJson(treeToJson(*tree), "tree");
+    const auto back = testing::treeFromJson(treeToJson(*tree), "tree");
     for (const std::string& name : taken) {
       const Node* node = tree->find("/system/" + name + "/ip");
       if (node == nullptr || *node->text(PROP_NAME) != name) return false;

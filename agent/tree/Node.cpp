@@ -39,9 +39,4 @@ const AddressList& Node::addresses() const {
   return list == nullptr ? none : **list;
 }
 
-bool Node::isOverlaid(PropertyNumber number) const {
-  const Property* property = find(number);
-  return property != nullptr && property->overlaid;
-}
-
 }  // namespace zorva::agent

@@ -111,9 +111,6 @@ class ZORVA_AGENT_API Node {
   /// The addresses of the interface, in the kernel's order; empty if none are known.
   const AddressList& addresses() const;
 
-  /// True if the node has the property and its value was set through the agent.
-  bool isOverlaid(PropertyNumber number) const;
-
  private:
   friend class TreeBuilder;
 

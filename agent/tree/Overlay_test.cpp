@@ -15,6 +15,7 @@
 #include "agent/Seams.h"
 #include "agent/interface/Instrumentation.h"
 #include "agent/testing/TemporaryDirectory.h"
+#include "agent/testing/Trees.h"
 
 namespace zorva::agent {
 namespace {
@@ -46,7 +47,7 @@ class OverlayTest : public ::testing::Test {
     config.dataDir = data();
     config.logTarget = directory_ / "log";
     setConfig(config);
-    setTreeSource(std::make_shared<FixedSource>(treeFromJson(kTree, "tree")));
+    setTreeSource(std::make_shared<testing::FixedSource>(testing::treeFromJson(kTree, "tree")));
   }
 
   std::string data() const { return directory_ / "data/"; }
@@ -121,7 +122,7 @@ TEST_F(OverlayTest, NothingIsSetAtANodeWithoutAnIpConfigurationOrAtNone) {
 TEST_F(OverlayTest, NothingIsSetAtANodeThatIsGone) {
   Instrumentation cursor;
   cursor.selectNode(eth0_);
-  setTreeSource(std::make_shared<FixedSource>(treeFromJson("{}", "tree")));
+  setTreeSource(std::make_shared<testing::FixedSource>(testing::treeFromJson("{}", "tree")));
   std::string value = "x";
   EXPECT_FALSE(cursor.setProperty(PROP_HOST_NAME, value));
 }
@@ -144,14 +145,14 @@ TEST_F(OverlayTest, AValueEqualToTheSourcesOwnClearsItsEntry) {
   EXPECT_TRUE(set(eth0_, PROP_DOMAIN_NAME, "example.org"));
   EXPECT_TRUE(setList(eth0_, PROP_DNS_SUFFIXES, {"example.org"}));
   EXPECT_TRUE(overlayEntries().empty());
-  EXPECT_FALSE(currentTree()->find(eth0_)->isOverlaid(PROP_DOMAIN_NAME));
+  EXPECT_FALSE(testing::isOverlaid(*currentTree()->find(eth0_), PROP_DOMAIN_NAME));
 }
 
 TEST_F(OverlayTest, ValuesThatWereSetAreMarkedInTheTreeAndListed) {
   EXPECT_TRUE(set(eth0_, PROP_HOST_NAME, "other"));
   const auto tree = currentTree();
-  EXPECT_TRUE(tree->find(eth0_)->isOverlaid(PROP_HOST_NAME));
-  EXPECT_FALSE(tree->find(eth0_)->isOverlaid(PROP_DOMAIN_NAME));
+  EXPECT_TRUE(testing::isOverlaid(*tree->find(eth0_), PROP_HOST_NAME));
+  EXPECT_FALSE(testing::isOverlaid(*tree->find(eth0_), PROP_DOMAIN_NAME));
   const auto entries = overlayEntries();
   ASSERT_EQ(entries.size(), 1U);
   EXPECT_EQ(entries[0].path, eth0_);
@@ -177,9 +178,9 @@ TEST_F(OverlayTest, ValuesAreClearedByInterfaceByPathAndAltogether) {
 
 TEST_F(OverlayTest, ValuesOfAnInterfaceThatIsNotThereWaitForIt) {
   EXPECT_TRUE(set(eth0_, PROP_HOST_NAME, "other"));
-  setTreeSource(std::make_shared<FixedSource>(treeFromJson("{}", "tree")));
+  setTreeSource(std::make_shared<testing::FixedSource>(testing::treeFromJson("{}", "tree")));
   EXPECT_EQ(overlayEntries().size(), 1U);
-  setTreeSource(std::make_shared<FixedSource>(treeFromJson(kTree, "tree")));
+  setTreeSource(std::make_shared<testing::FixedSource>(testing::treeFromJson(kTree, "tree")));
   EXPECT_EQ(get(eth0_, PROP_HOST_NAME), "other");
 }
 

@@ -9,6 +9,7 @@
 #include "agent/Agent.h"
 #include "agent/sources/FileSource.h"
 #include "agent/testing/TemporaryDirectory.h"
+#include "agent/testing/Trees.h"
 
 namespace zorva::agent {
 namespace {
@@ -66,7 +67,7 @@ constexpr const char* kExample = R"({
 // The error of a document.
 std::string wrong(const std::string& text) {
   try {
-    treeFromJson(text, "tree.json");
+    testing::treeFromJson(text, "tree.json");
   } catch (const ConfigError& error) {
     EXPECT_EQ(std::string(error.what()).find('\n'), std::string::npos) << "an error is one line";
     return error.what();
@@ -80,11 +81,11 @@ std::string nodeWith(const std::string& members) {
 }
 
 TEST(TreeJson, TheDocumentIsWrittenAsItWasRead) {
-  EXPECT_EQ(treeToJson(*treeFromJson(kExample, "tree.json")), kExample);
+  EXPECT_EQ(treeToJson(*testing::treeFromJson(kExample, "tree.json")), kExample);
 }
 
 TEST(TreeJson, EveryPropertyIsRead) {
-  const auto tree = treeFromJson(kExample, "tree.json");
+  const auto tree = testing::treeFromJson(kExample, "tree.json");
   EXPECT_EQ(tree->systemName(), "host1");
   const Node* node = tree->find("/system/eth0/ip");
   ASSERT_NE(node, nullptr);
@@ -100,7 +101,7 @@ TEST(TreeJson, EveryPropertyIsRead) {
 }
 
 TEST(TreeJson, APropertyThatIsLeftOutIsAbsentAndAnEmptyOneIsNot) {
-  const auto tree = treeFromJson(nodeWith(R"("properties": {"name": "", "dns_suffixes": []})"), "tree.json");
+  const auto tree = testing::treeFromJson(nodeWith(R"("properties": {"name": "", "dns_suffixes": []})"), "tree.json");
   const Node* node = tree->find("/ip");
   ASSERT_NE(node, nullptr);
   EXPECT_EQ(*node->text(PROP_NAME), "");
@@ -110,7 +111,7 @@ TEST(TreeJson, APropertyThatIsLeftOutIsAbsentAndAnEmptyOneIsNot) {
 }
 
 TEST(TreeJson, AnEmptyObjectIsATreeOfTheRootAlone) {
-  const auto tree = treeFromJson("{}", "tree.json");
+  const auto tree = testing::treeFromJson("{}", "tree.json");
   EXPECT_EQ(tree->nodes().size(), 1U);
   EXPECT_EQ(tree->systemName(), "");
 }
@@ -121,7 +122,7 @@ TEST(TreeJson, EveryByteComesBackAsItWas) {
     const std::string name{static_cast<char>(first), 'x', '\xF0', '\x9F'};
     TreeBuilder builder(name);
     builder.add(0, NodeType::Port, name, name);
-    const auto back = treeFromJson(treeToJson(*builder.finish()), "tree.json");
+    const auto back = testing::treeFromJson(treeToJson(*builder.finish()), "tree.json");
     EXPECT_EQ(back->systemName(), name);
     ASSERT_EQ(back->nodes().size(), 2U);
     EXPECT_EQ(back->nodes()[1].name(), name);
@@ -132,13 +133,13 @@ TEST(TreeJson, EveryByteComesBackAsItWas) {
 TEST(TreeJson, CharactersOfThePrivatePlaneThatMeanBytesAreReadBackToo) {
   const std::string name = "\xF4\x8E\xBB\xBF";  // U+10EEFF
   TreeBuilder builder(name);
-  EXPECT_EQ(treeFromJson(treeToJson(*builder.finish()), "tree.json")->systemName(), name);
+  EXPECT_EQ(testing::treeFromJson(treeToJson(*builder.finish()), "tree.json")->systemName(), name);
 }
 
 TEST(TreeJson, NulInATextComesBack) {
   const std::string text("a\0b", 3);
   TreeBuilder builder(text);
-  EXPECT_EQ(treeFromJson(treeToJson(*builder.finish()), "tree.json")->systemName(), text);
+  EXPECT_EQ(testing::treeFromJson(treeToJson(*builder.finish()), "tree.json")->systemName(), text);
 }
 
 TEST(TreeJson, WhatIsNoJsonIsNamedWithItsLine) {

@@ -4,6 +4,8 @@
 
 #include <stdexcept>
 
+#include "agent/testing/Trees.h"
+
 namespace zorva::agent {
 namespace {
 
@@ -92,9 +94,9 @@ TEST_F(SmallTree, ACopyIsChangedWithoutTheOriginal) {
   builder.set(tree_->find("/system/eth0/ip")->index(), PROP_NAME, "other", true);
   const auto changed = builder.finish();
   EXPECT_EQ(*changed->find("/system/eth0/ip")->text(PROP_NAME), "other");
-  EXPECT_TRUE(changed->find("/system/eth0/ip")->isOverlaid(PROP_NAME));
+  EXPECT_TRUE(testing::isOverlaid(*changed->find("/system/eth0/ip"), PROP_NAME));
   EXPECT_EQ(*tree_->find("/system/eth0/ip")->text(PROP_NAME), "eth0");
-  EXPECT_FALSE(tree_->find("/system/eth0/ip")->isOverlaid(PROP_NAME));
+  EXPECT_FALSE(testing::isOverlaid(*tree_->find("/system/eth0/ip"), PROP_NAME));
   EXPECT_EQ(pathsOf(*changed), pathsOf(*tree_));
 }
 

@@ -27,15 +27,4 @@ class TreeSource {
   virtual void reopen() {}
 };
 
-/// A source with a fixed tree.
-class FixedSource : public TreeSource {
- public:
-  explicit FixedSource(std::shared_ptr<const TreeSnapshot> tree) : tree_(std::move(tree)) {}
-  bool changed() override { return false; }
-  std::shared_ptr<const TreeSnapshot> read() override { return tree_; }
-
- private:
-  std::shared_ptr<const TreeSnapshot> tree_;
-};
-
 }  // namespace zorva::agent

@@ -128,13 +128,18 @@ TEST_F(SettingFileTest, RefusesNamesThatLeadElsewhere) {
 }
 
 TEST(SettingsOfHost, SayWhatTheInterfaceSays) {
-  const auto tree = zorva::agent::treeFromJson(
-      R"({"system_name": "h", "nodes": [{"type": "System", "name": "s", "description": "Computer", "children": [
-          {"type": "Port", "name": "eth0", "description": "", "children": [
-          {"type": "NetworkIPConfig", "name": "ip", "description": "", "properties": {"name": "eth0",
-           "host_name": "h", "dns_server_addresses": ["192.0.2.1", "192.0.2.2"],
-           "addresses": [{"address": "192.0.2.9", "prefix_length": 24, "origin": "dhcp"}]}}]}]}]})",
-      "tree");
+  zorva::agent::TreeBuilder builder("h");
+  const std::size_t system = builder.add(0, zorva::agent::NodeType::System, "s", "Computer");
+  const std::size_t port = builder.add(system, zorva::agent::NodeType::Port, "eth0");
+  const std::size_t node = builder.add(port, zorva::agent::NodeType::NetworkIPConfig, "ip");
+  builder.set(node, ZV::NodeLexicon::PROP_NAME, "eth0");
+  builder.set(node, ZV::NodeLexicon::PROP_HOST_NAME, "h");
+  builder.set(node, ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES,
+              std::make_shared<const zorva::agent::StringList>(zorva::agent::StringList{"192.0.2.1", "192.0.2.2"}));
+  builder.set(node, zorva::agent::kAddresses,
+              std::make_shared<const zorva::agent::AddressList>(
+                  zorva::agent::AddressList{{"192.0.2.9", 24, zorva::agent::AddressOrigin::Dhcp}}));
+  const auto tree = builder.finish();
   std::string text;
   for (const SettingLine& line : settingsOfHost(interfaceNode(*tree, "eth0")))
     text += line.key + "=" + line.value + "|";

@@ -15,6 +15,7 @@
 #include "agent/sources/FileSource.h"
 #include "agent/sources/HostSource.h"
 #include "agent/testing/TemporaryDirectory.h"
+#include "agent/testing/Trees.h"
 
 namespace ZV::Test {
 namespace {
@@ -95,7 +96,8 @@ TEST_F(SourceFaults, ALogThatCannotBeWrittenStopsNothing) {
     for (std::size_t n = 1;; ++n, ++tried) {
       zorva::agent::reset();
       zorva::agent::setConfig(config);
-      zorva::agent::setTreeSource(std::make_shared<zorva::agent::FixedSource>(World().host().nic("eth0").tree()));
+      zorva::agent::setTreeSource(
+          std::make_shared<zorva::agent::testing::FixedSource>(World().host().nic("eth0").tree()));
       const FailingFiles failing(n, fault);
       RecordingBroker broker;
       const Outcome outcome = requestsOf(allProviders().front()).front().run(broker);

@@ -8,22 +8,20 @@
 #include <utility>
 
 #include "agent/Agent.h"
+#include "agent/testing/Trees.h"
 #include "tests/support/RecordingLogger.h"
+
+namespace agent = zorva::agent;
 
 namespace ZV::Test {
 
 namespace {
 
-using zorva::agent::NodeType;
-using zorva::agent::PropertyNumber;
-using zorva::agent::TreeBuilder;
-using zorva::agent::TreeSnapshot;
-
 class UnreadableSource : public zorva::agent::TreeSource {
  public:
   explicit UnreadableSource(std::string reason) : reason_(std::move(reason)) {}
   bool changed() override { return true; }
-  std::shared_ptr<const TreeSnapshot> read() override { throw std::runtime_error(reason_); }
+  std::shared_ptr<const agent::TreeSnapshot> read() override { throw std::runtime_error(reason_); }
 
  private:
   std::string reason_;
@@ -41,19 +39,21 @@ std::string portName(const std::string& name, std::size_t n) {
   return (isPlain ? name : "port") + "-" + std::to_string(n);
 }
 
-void setText(TreeBuilder& builder, std::size_t node, PropertyNumber number, const std::optional<std::string>& text) {
+void setText(agent::TreeBuilder& builder, std::size_t node, agent::PropertyNumber number,
+             const std::optional<std::string>& text) {
   if (text.has_value()) builder.set(node, number, *text);
 }
 
-void setNumber(TreeBuilder& builder, std::size_t node, PropertyNumber number, std::optional<unsigned int> value) {
+void setNumber(agent::TreeBuilder& builder, std::size_t node, agent::PropertyNumber number,
+               std::optional<unsigned int> value) {
   if (value.has_value()) builder.set(node, number, *value);
 }
 
-void setList(TreeBuilder& builder, std::size_t node, PropertyNumber number, const OptionalTexts& texts) {
+void setList(agent::TreeBuilder& builder, std::size_t node, agent::PropertyNumber number, const OptionalTexts& texts) {
   if (texts.given()) builder.set(node, number, std::make_shared<const zorva::agent::StringList>(texts.texts()));
 }
 
-void setProperties(TreeBuilder& builder, std::size_t node, const std::string& name, const NicProperties& nic) {
+void setProperties(agent::TreeBuilder& builder, std::size_t node, const std::string& name, const NicProperties& nic) {
   if (!nic.isUnnamed) setText(builder, node, NodeLexicon::PROP_NAME, nic.name.value_or(name));
   setText(builder, node, NodeLexicon::PROP_HOST_NAME, nic.hostName);
   setText(builder, node, NodeLexicon::PROP_DOMAIN_NAME, nic.domain);
@@ -120,7 +120,7 @@ void World::useConfig() const {
 World& World::install() {
   forgetWorld();
   useConfig();
-  zorva::agent::setTreeSource(std::make_shared<zorva::agent::FixedSource>(tree()));
+  zorva::agent::setTreeSource(std::make_shared<zorva::agent::testing::FixedSource>(tree()));
   installed_ = true;
   return *this;
 }
@@ -133,33 +133,33 @@ World& World::installUnreadable(const std::string& reason) {
   return *this;
 }
 
-std::shared_ptr<const TreeSnapshot> World::tree() const {
-  TreeBuilder builder(systemName_);
+std::shared_ptr<const agent::TreeSnapshot> World::tree() const {
+  agent::TreeBuilder builder(systemName_);
   for (std::size_t s = 0; s < systems_.size(); ++s) {
-    const std::size_t system = builder.add(0, NodeType::System, systems_[s].name, systems_[s].description);
+    const std::size_t system = builder.add(0, agent::NodeType::System, systems_[s].name, systems_[s].description);
     for (std::size_t n = 0; n < nics_.size(); ++n) {
       if (nics_[n].system != s) continue;
-      const std::size_t port = builder.add(system, NodeType::Port, portName(nics_[n].name, n));
-      const std::size_t config = builder.add(port, NodeType::NetworkIPConfig, "ip");
+      const std::size_t port = builder.add(system, agent::NodeType::Port, portName(nics_[n].name, n));
+      const std::size_t config = builder.add(port, agent::NodeType::NetworkIPConfig, "ip");
       setProperties(builder, config, nics_[n].name, nics_[n].properties);
     }
   }
   return builder.finish();
 }
 
-const zorva::agent::Node* World::nodeOf(const TreeSnapshot& snapshot, std::size_t nic) const {
+const zorva::agent::Node* World::nodeOf(const agent::TreeSnapshot& snapshot, std::size_t nic) const {
   const Nic& asked = nics_.at(nic);
   return snapshot.find("/" + systems_[asked.system].name + "/" + portName(asked.name, nic) + "/ip");
 }
 
-std::optional<std::string> World::text(std::size_t nic, PropertyNumber property) const {
+std::optional<std::string> World::text(std::size_t nic, agent::PropertyNumber property) const {
   const auto snapshot = zorva::agent::currentTree();
   const zorva::agent::Node* node = nodeOf(*snapshot, nic);
   const std::string* held = node == nullptr ? nullptr : node->text(property);
   return held == nullptr ? std::nullopt : std::optional(*held);
 }
 
-std::optional<std::vector<std::string>> World::list(std::size_t nic, PropertyNumber property) const {
+std::optional<std::vector<std::string>> World::list(std::size_t nic, agent::PropertyNumber property) const {
   const auto snapshot = zorva::agent::currentTree();
   const zorva::agent::Node* node = nodeOf(*snapshot, nic);
   const zorva::agent::StringList* held = node == nullptr ? nullptr : node->list(property);
