@@ -18,6 +18,7 @@
 #include "agent/Seams.h"
 #include "agent/interface/Instrumentation.h"
 #include "agent/sources/HostSource.h"
+#include "bench/agent/PlaceCursor.h"
 
 namespace {
 
@@ -31,15 +32,7 @@ Socket openSocket(unsigned int groups) {
   return socket;
 }
 
-void PlaceCursor(benchmark::State& state) {
-  zorva::agent::setConfig(zorva::agent::Config());
-  for (auto _ : state) {
-    ZV::Instrumentation cursor;
-    cursor.selectNode(ZV::NodeLexicon::NODE_NETWORK_IP_CONFIG);
-    benchmark::DoNotOptimize(cursor);
-  }
-  zorva::agent::reset();
-}
+void PlaceCursor(benchmark::State& state) { placeCursors(state); }
 BENCHMARK(PlaceCursor);
 
 // One socket for the kernel's messages, and one inotify descriptor each for the host's files and for the overlay.

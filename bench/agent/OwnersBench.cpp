@@ -19,20 +19,13 @@
 #include "agent/interface/Instrumentation.h"
 #include "agent/testing/NetworkNamespace.h"
 #include "agent/testing/PrivateHost.h"
+#include "bench/agent/PlaceCursor.h"
 
 namespace {
 
 constexpr int kNoPrivateHost = 77;
 
-void PlaceCursorWithOwners(benchmark::State& state) {
-  zorva::agent::setConfig(zorva::agent::Config());
-  for (auto _ : state) {
-    ZV::Instrumentation cursor;
-    cursor.selectNode(ZV::NodeLexicon::NODE_NETWORK_IP_CONFIG);
-    benchmark::DoNotOptimize(cursor);
-  }
-  zorva::agent::reset();
-}
+void PlaceCursorWithOwners(benchmark::State& state) { placeCursors(state); }
 BENCHMARK(PlaceCursorWithOwners);
 
 int openNetlink() {
