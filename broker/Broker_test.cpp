@@ -23,20 +23,17 @@ using ::testing::StartsWith;
 class BrokerTest : public ::testing::Test {
  protected:
   BrokerTest() {
-    BrokerOptions options;
-    options.registry = ProviderRegistry();
-    const char* library = "zorvabrokertestprovider";
-    options.registry.add({"T_Thing", "Thing", library, InstanceMi | MethodMi});
-    options.registry.add({"T_SpecialThing", "Thing", library, InstanceMi});
-    options.registry.add({"T_Other", "Other", library, InstanceMi});
-    options.registry.add({"T_Trouble", "Trouble", library, InstanceMi});
-    options.registry.add({"T_Calling", "Calling", library, InstanceMi});
-    options.registry.add({"T_Absent", "Absent", "no-such-library", InstanceMi});
-    options.registry.add({"T_Two", "Missing", library, InstanceMi});
-    options.registry.add({"T_ThingOther", "Link", library, InstanceMi | AssociationMi});
-    options.registry.add({"T_ThingTrouble", "Refusing", library, AssociationMi});
-    options.registry.add({"T_ThingAbsent", "Absent", "no-such-library", AssociationMi});
-    options.providerDirectory = ZORVA_LIB_DIR;
+    BrokerOptions options = testing::testOptions(
+        ZORVA_LIB_DIR, {testing::testProvider("T_Thing", "Thing", InstanceMi | MethodMi),
+                        testing::testProvider("T_SpecialThing", "Thing", InstanceMi),
+                        testing::testProvider("T_Other", "Other", InstanceMi),
+                        testing::testProvider("T_Trouble", "Trouble", InstanceMi),
+                        testing::testProvider("T_Calling", "Calling", InstanceMi),
+                        ProviderEntry{"T_Absent", "Absent", "no-such-library", InstanceMi},
+                        testing::testProvider("T_Two", "Missing", InstanceMi),
+                        testing::testProvider("T_ThingOther", "Link", InstanceMi | AssociationMi),
+                        testing::testProvider("T_ThingTrouble", "Refusing", AssociationMi),
+                        ProviderEntry{"T_ThingAbsent", "Absent", "no-such-library", AssociationMi}});
     options.log = [this](LogLevel, std::string_view text) {
       const std::lock_guard lock(mutex_);
       lines_.emplace_back(text);

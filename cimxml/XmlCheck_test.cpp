@@ -3,9 +3,14 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <string>
+#include <utility>
+#include <vector>
+
 namespace zorva::cimxml {
 namespace {
 
+using Cases = std::vector<std::pair<std::string, std::string>>;
 using ::testing::HasSubstr;
 
 /// The error of a text; empty if there is none.
@@ -50,25 +55,31 @@ TEST(XmlCheck, KnowsNoEntitiesButXmlsOwn) {
 }
 
 TEST(XmlCheck, RequiresOneRootElementAndNothingBesideIt) {
-  EXPECT_EQ(problemOf(""), "the text has no element");
-  EXPECT_EQ(problemOf("  \n"), "the text has no element");
-  EXPECT_EQ(problemOf("<a/><b/>"), "a second root element");
-  EXPECT_EQ(problemOf("<a/>x"), "text outside the root element");
-  EXPECT_EQ(problemOf("x<a/>"), "text outside the root element");
-  EXPECT_EQ(problemOf("<![CDATA[x]]><a/>"), "text outside the root element");
+  const Cases cases = {
+      {"", "the text has no element"},
+      {"  \n", "the text has no element"},
+      {"<a/><b/>", "a second root element"},
+      {"<a/>x", "text outside the root element"},
+      {"x<a/>", "text outside the root element"},
+      {"<![CDATA[x]]><a/>", "text outside the root element"},
+  };
+  for (const auto& [text, problem] : cases) EXPECT_EQ(problemOf(text), problem) << text;
 }
 
 TEST(XmlCheck, RefusesATextThatEndsTooSoon) {
-  EXPECT_EQ(problemOf("<a><b></b>"), "the text ends within an element");
-  EXPECT_EQ(problemOf("<a b='"), "a tag that does not end");
-  EXPECT_EQ(problemOf("<a"), "a tag that does not end");
-  EXPECT_EQ(problemOf("<a><!-- "), "a comment does not end");
-  EXPECT_EQ(problemOf("<a><![CDATA[ ]]"), "a CDATA section does not end");
-  EXPECT_EQ(problemOf("<?xml "), "a processing instruction does not end");
-  EXPECT_EQ(problemOf("<!DOCTYPE a"), "the document type does not end");
-  EXPECT_EQ(problemOf("<a/></a>"), "an end tag that ends nothing");
-  EXPECT_EQ(problemOf("<a></a"), "an end tag that ends nothing");
-  EXPECT_EQ(problemOf("<a b='<'/>"), "'<' within a tag");
+  const Cases cases = {
+      {"<a><b></b>", "the text ends within an element"},
+      {"<a b='", "a tag that does not end"},
+      {"<a", "a tag that does not end"},
+      {"<a><!-- ", "a comment does not end"},
+      {"<a><![CDATA[ ]]", "a CDATA section does not end"},
+      {"<?xml ", "a processing instruction does not end"},
+      {"<!DOCTYPE a", "the document type does not end"},
+      {"<a/></a>", "an end tag that ends nothing"},
+      {"<a></a", "an end tag that ends nothing"},
+      {"<a b='<'/>", "'<' within a tag"},
+  };
+  for (const auto& [text, problem] : cases) EXPECT_EQ(problemOf(text), problem) << text;
 }
 
 TEST(XmlCheck, TakesNoOtherEncoding) {

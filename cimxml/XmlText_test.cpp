@@ -3,9 +3,13 @@
 #include <gtest/gtest.h>
 
 #include <string>
+#include <utility>
+#include <vector>
 
 namespace zorva::cimxml {
 namespace {
+
+using Cases = std::vector<std::pair<std::string, std::string>>;
 
 std::string escaped(std::string_view text) {
   std::string out;
@@ -20,14 +24,17 @@ TEST(XmlText, HasNothingThatAnXmlReaderWouldTakeForMarkup) {
 TEST(XmlText, KeepsLineEndsAndTabsThroughAReader) { EXPECT_EQ(escaped("a\r\n\tb"), "a&#13;&#10;&#9;b"); }
 
 TEST(XmlText, ReplacesWhatXmlCannotHold) {
-  EXPECT_EQ(escaped(std::string("a\x01", 2)), "a\xEF\xBF\xBD");
-  EXPECT_EQ(escaped(std::string("\0b", 2)),
-            "\xEF\xBF\xBD"
-            "b");
-  EXPECT_EQ(escaped("\xFFz"), "\xEF\xBF\xBDz");
-  EXPECT_EQ(escaped("\xEF\xBF\xBE"), "\xEF\xBF\xBD");
-  EXPECT_EQ(escaped("ab\xC3"), "ab\xEF\xBF\xBD");
-  EXPECT_EQ(escaped("a\x7F"), "a\x7F");
+  const Cases cases = {
+      {std::string("a\x01", 2), "a\xEF\xBF\xBD"},
+      {std::string("\0b", 2),
+       "\xEF\xBF\xBD"
+       "b"},
+      {"\xFFz", "\xEF\xBF\xBDz"},
+      {"\xEF\xBF\xBE", "\xEF\xBF\xBD"},
+      {"ab\xC3", "ab\xEF\xBF\xBD"},
+      {"a\x7F", "a\x7F"},
+  };
+  for (const auto& [text, expected] : cases) EXPECT_EQ(escaped(text), expected) << text;
 }
 
 TEST(XmlText, LeavesOtherCharactersAsTheyAre) {

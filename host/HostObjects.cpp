@@ -12,13 +12,6 @@
 
 namespace zorva::host {
 
-using zorva::agent::AddressFamily;
-using zorva::agent::AddressOrigin;
-using zorva::agent::InterfaceAddress;
-using zorva::agent::Node;
-using zorva::agent::NodeType;
-using zorva::agent::TreeSnapshot;
-
 namespace {
 
 constexpr const char* kComputerSystemClass = "ZORVA_ComputerSystem";
@@ -96,24 +89,24 @@ HostObject serviceProcessor() {
 
 // One interface of the tree and its owning system.
 struct Interface {
-  const Node& config;
+  const agent::Node& config;
   std::string name;
   bool onServiceProcessor;
 };
 
 // Every interface in tree order. An interface without a name gets the name of its port.
-std::vector<Interface> interfaces(const TreeSnapshot& tree) {
+std::vector<Interface> interfaces(const agent::TreeSnapshot& tree) {
   std::vector<Interface> found;
-  for (const Node* node = tree.nextOfType(NodeType::NetworkIPConfig, 0); node != nullptr;
-       node = tree.nextOfType(NodeType::NetworkIPConfig, node->index() + 1)) {
-    const Node& port = tree.parent(*node);
+  for (const agent::Node* node = tree.nextOfType(agent::NodeType::NetworkIPConfig, 0); node != nullptr;
+       node = tree.nextOfType(agent::NodeType::NetworkIPConfig, node->index() + 1)) {
+    const agent::Node& port = tree.parent(*node);
     const std::string* name = node->text(ZV::NodeLexicon::PROP_NAME);
     found.push_back({*node, name != nullptr ? *name : port.name(), tree.parent(port).isServiceProcessor()});
   }
   return found;
 }
 
-std::uint16_t enabledState(const Node& config) {
+std::uint16_t enabledState(const agent::Node& config) {
   const unsigned int* state = config.number(ZV::NodeLexicon::PROP_ENABLED_STATE);
   if (state == nullptr) return kNotApplicable;
   switch (*state) {
@@ -128,24 +121,24 @@ std::uint16_t enabledState(const Node& config) {
   }
 }
 
-std::uint16_t addressOrigin(const InterfaceAddress& address) {
-  const bool isIPv4 = address.family() == AddressFamily::IPv4;
+std::uint16_t addressOrigin(const agent::InterfaceAddress& address) {
+  const bool isIPv4 = address.family() == agent::AddressFamily::IPv4;
   switch (address.origin) {
-    case AddressOrigin::Static:
+    case agent::AddressOrigin::Static:
       return 3;
-    case AddressOrigin::Dhcp:
+    case agent::AddressOrigin::Dhcp:
       return isIPv4 ? 4 : 7;
-    case AddressOrigin::Slaac:
+    case agent::AddressOrigin::Slaac:
       return 8;
-    case AddressOrigin::LinkLocal:
+    case agent::AddressOrigin::LinkLocal:
       return isIPv4 ? 6 : 10;
-    case AddressOrigin::Unknown:
+    case agent::AddressOrigin::Unknown:
       break;
   }
   return 0;
 }
 
-HostObject ipEndpoint(const Interface& interface, const InterfaceAddress& address, const std::string& name,
+HostObject ipEndpoint(const Interface& interface, const agent::InterfaceAddress& address, const std::string& name,
                       const std::string& systemName) {
   HostObject object{kIPEndpointClass,
                     {{"SystemCreationClassName",
@@ -159,7 +152,7 @@ HostObject ipEndpoint(const Interface& interface, const InterfaceAddress& addres
                      {"AddressOrigin", addressOrigin(address)},
                      {"EnabledState", enabledState(interface.config)},
                      {"RequestedState", kRequestNotApplicable}}};
-  if (address.family() == AddressFamily::IPv4) {
+  if (address.family() == agent::AddressFamily::IPv4) {
     object.properties.push_back({"ProtocolIFType", kIPv4});
     object.properties.push_back({"IPv4Address", address.address});
     object.properties.push_back({"SubnetMask", subnetMask(address.prefixLength)});
@@ -172,8 +165,9 @@ HostObject ipEndpoint(const Interface& interface, const InterfaceAddress& addres
   return object;
 }
 
-HostObject ipAssignment(const std::string& instanceID, const Interface& interface, const InterfaceAddress& address) {
-  const bool isIPv4 = address.family() == AddressFamily::IPv4;
+HostObject ipAssignment(const std::string& instanceID, const Interface& interface,
+                        const agent::InterfaceAddress& address) {
+  const bool isIPv4 = address.family() == agent::AddressFamily::IPv4;
   return {kIPAssignmentClass,
           {{"InstanceID", instanceID}},
           {{"ElementName", interface.name + (isIPv4 ? " IPv4" : " IPv6")},
@@ -184,9 +178,9 @@ HostObject ipAssignment(const std::string& instanceID, const Interface& interfac
 
 }  // namespace
 
-std::vector<HostObject> computerSystems(const TreeSnapshot& tree) {
+std::vector<HostObject> computerSystems(const agent::TreeSnapshot& tree) {
   std::vector<HostObject> objects = {hostSystem(tree.systemName())};
-  for (const Node& node : tree.nodes()) {
+  for (const agent::Node& node : tree.nodes()) {
     if (!node.isServiceProcessor()) continue;
     objects.push_back(serviceProcessor());
     break;  // otherwise several would share one name
@@ -194,7 +188,7 @@ std::vector<HostObject> computerSystems(const TreeSnapshot& tree) {
   return objects;
 }
 
-std::vector<HostObject> ipEndpoints(const TreeSnapshot& tree) {
+std::vector<HostObject> ipEndpoints(const agent::TreeSnapshot& tree) {
   const std::vector<Interface> all = interfaces(tree);
   std::set<std::string> names;
   for (const Interface& interface : all) names.insert(interface.name);
@@ -203,7 +197,7 @@ std::vector<HostObject> ipEndpoints(const TreeSnapshot& tree) {
   std::set<std::string> begun;  // interfaces whose first address already has the plain name
   for (const Interface& interface : all) {
     unsigned int ordinal = 1;
-    for (const InterfaceAddress& address : interface.config.addresses()) {
+    for (const agent::InterfaceAddress& address : interface.config.addresses()) {
       std::string name = interface.name;
       if (!begun.insert(interface.name).second) {
         do {
@@ -216,13 +210,13 @@ std::vector<HostObject> ipEndpoints(const TreeSnapshot& tree) {
   return objects;
 }
 
-std::vector<HostObject> ipAssignments(const TreeSnapshot& tree) {
+std::vector<HostObject> ipAssignments(const agent::TreeSnapshot& tree) {
   std::vector<HostObject> objects;
   std::set<std::string> known;
   for (const Interface& interface : interfaces(tree)) {
     const std::string prefix = (interface.onServiceProcessor ? "BMC%" : "Computer%") + interface.name;
-    for (const InterfaceAddress& address : interface.config.addresses()) {
-      const std::string instanceID = prefix + (address.family() == AddressFamily::IPv4 ? "%ipv4" : "%ipv6");
+    for (const agent::InterfaceAddress& address : interface.config.addresses()) {
+      const std::string instanceID = prefix + (address.family() == agent::AddressFamily::IPv4 ? "%ipv4" : "%ipv6");
       // The first address of each version determines the origin.
       if (known.insert(instanceID).second) objects.push_back(ipAssignment(instanceID, interface, address));
     }

@@ -4,6 +4,7 @@
 #include <set>
 
 #include "host/SubnetMask.h"
+#include "tests/support/Matchers.h"
 #include "tests/support/ProviderCall.h"
 #include "tests/support/World.h"
 
@@ -17,11 +18,7 @@ CMPIInstanceMI* HostIPAssignmentSettingDataProvider_Create_InstanceMI(const CMPI
 namespace ZV::Test {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
-using ::testing::IsEmpty;
 using ::testing::Not;
-using ::testing::SizeIs;
 using zorva::agent::AddressOrigin;
 
 // A host with two interfaces, the first with three addresses, and a service processor with one.

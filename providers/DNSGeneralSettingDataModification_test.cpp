@@ -3,6 +3,7 @@
 #include <filesystem>
 
 #include "providers/testing/ModificationTestSupport.h"
+#include "tests/support/ManyTexts.h"
 
 namespace ZV::Test {
 namespace {
@@ -106,15 +107,10 @@ TEST_F(DNSGeneralSettingDataModification, ElementsThatTheBrokerFailsToGiveAreLef
 }
 
 TEST_F(DNSGeneralSettingDataModification, AHundredThousandSuffixesAreWritten) {
-  std::vector<std::string> suffixes;
-  std::string value;
-  for (int i = 0; i < 100000; ++i) {
-    suffixes.push_back("s" + std::to_string(i));
-    value += suffixes.back() + " ";
-  }
+  const ManyTexts many("s");
   broker.keepsLines = false;
-  EXPECT_EQ(CMPI_RC_OK, modify(kWhole.with("DNSSuffixesToAppend", texts(suffixes))).rc);
-  EXPECT_TRUE("DOMAINNAME=d\nDNSSUFFIXES=" + value + "\nCONFIG_NAME=home\n" == content());
+  EXPECT_EQ(CMPI_RC_OK, modify(kWhole.with("DNSSuffixesToAppend", texts(many.texts))).rc);
+  EXPECT_TRUE("DOMAINNAME=d\nDNSSUFFIXES=" + many.line + "\nCONFIG_NAME=home\n" == content());
 }
 
 // --- which file

@@ -7,11 +7,7 @@ class HostedAccessPoint : public AssociationTest {
  protected:
   HostedAccessPoint() : AssociationTest("DNSHostedAccessPointProvider") {}
 
-  void serve(const Names& systems) {
-    std::vector<Path> paths;
-    for (const std::string& name : systems) paths.push_back(systemPath(name));
-    broker.serve(kSystemClass, objectsOf(paths));
-  }
+  void serve(const Names& systems) { AssociationTest::serve(kSystemClass, systemPath, systems); }
 };
 
 TEST_F(HostedAccessPoint, PairsASystemWithTheEndpointsThatHaveItsName) {

@@ -7,11 +7,7 @@ class OrderedComponent : public AssociationTest {
  protected:
   OrderedComponent() : AssociationTest("DNSOrderedComponentProvider") {}
 
-  void serve(const Names& instanceIDs) {
-    std::vector<Path> paths;
-    for (const std::string& instanceID : instanceIDs) paths.push_back(ipAssignmentPath(instanceID));
-    broker.serve(kIpAssignmentClass, objectsOf(paths));
-  }
+  void serve(const Names& instanceIDs) { AssociationTest::serve(kIpAssignmentClass, ipAssignmentPath, instanceIDs); }
 };
 
 TEST_F(OrderedComponent, PairsAnAssignmentWithTheSettingOfItsInterface) {

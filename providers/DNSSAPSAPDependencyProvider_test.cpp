@@ -7,11 +7,7 @@ class SAPSAPDependency : public AssociationTest {
  protected:
   SAPSAPDependency() : AssociationTest("DNSSAPSAPDependencyProvider") {}
 
-  void serve(const Names& ipEndpoints) {
-    std::vector<Path> paths;
-    for (const std::string& name : ipEndpoints) paths.push_back(ipEndpointPath(name));
-    broker.serve(kIpEndpointClass, objectsOf(paths));
-  }
+  void serve(const Names& ipEndpoints) { AssociationTest::serve(kIpEndpointClass, ipEndpointPath, ipEndpoints); }
 };
 
 TEST_F(SAPSAPDependency, PairsTheEndpointsOfOneName) {

@@ -7,6 +7,9 @@
 #include <fstream>
 #include <map>
 #include <random>
+#include <string>
+#include <utility>
+#include <vector>
 
 #include "schema/BuiltInMof.h"
 #include "schema/Mof.h"
@@ -14,6 +17,7 @@
 namespace zorva::schema {
 namespace {
 
+using Cases = std::vector<std::pair<std::string, std::string>>;
 using ::testing::HasSubstr;
 
 // Keeps the declarations of a text.
@@ -185,17 +189,20 @@ TEST(MofReader, ReadsTextsWithEscapes) {
 }
 
 TEST(MofReader, RefusesBrokenTexts) {
-  EXPECT_EQ(valueError("\"abc"), "t.mof:2:5: expected '\"' that closes this text before the end of the line");
-  EXPECT_EQ(valueError("\"ab\nc\""), "t.mof:2:5: expected '\"' that closes this text before the end of the line");
-  EXPECT_EQ(valueError("\"a\\q\""), "t.mof:2:7: expected one of b t n f r \" ' \\ x after '\\'");
-  EXPECT_EQ(valueError("\"a\\xg\""), "t.mof:2:7: expected one to four hexadecimal digits after '\\x'");
-  EXPECT_EQ(valueError("\"\\x0\""), "t.mof:2:6: expected a character, found an escape for none");
-  EXPECT_EQ(valueError("\"\\xD800\""), "t.mof:2:6: expected a character, found an escape for none");
-  EXPECT_EQ(valueError("\"\x01\""), "t.mof:2:6: expected '\"' or a printable character, found byte 0x01");
-  EXPECT_EQ(valueError("\"a\xC3(\""), "t.mof:2:7: expected UTF-8, found byte 0xc3");
-  EXPECT_EQ(valueError("\"\xED\xA0\x80\""), "t.mof:2:6: expected UTF-8, found byte 0xed");
-  EXPECT_EQ(valueError("\"\xC0\x80\""), "t.mof:2:6: expected UTF-8, found byte 0xc0");
-  EXPECT_EQ(valueError("\"\xF4\x90\x80\x80\""), "t.mof:2:6: expected UTF-8, found byte 0xf4");
+  const Cases cases = {
+      {"\"abc", "t.mof:2:5: expected '\"' that closes this text before the end of the line"},
+      {"\"ab\nc\"", "t.mof:2:5: expected '\"' that closes this text before the end of the line"},
+      {"\"a\\q\"", "t.mof:2:7: expected one of b t n f r \" ' \\ x after '\\'"},
+      {"\"a\\xg\"", "t.mof:2:7: expected one to four hexadecimal digits after '\\x'"},
+      {"\"\\x0\"", "t.mof:2:6: expected a character, found an escape for none"},
+      {"\"\\xD800\"", "t.mof:2:6: expected a character, found an escape for none"},
+      {"\"\x01\"", "t.mof:2:6: expected '\"' or a printable character, found byte 0x01"},
+      {"\"a\xC3(\"", "t.mof:2:7: expected UTF-8, found byte 0xc3"},
+      {"\"\xED\xA0\x80\"", "t.mof:2:6: expected UTF-8, found byte 0xed"},
+      {"\"\xC0\x80\"", "t.mof:2:6: expected UTF-8, found byte 0xc0"},
+      {"\"\xF4\x90\x80\x80\"", "t.mof:2:6: expected UTF-8, found byte 0xf4"},
+  };
+  for (const auto& [text, error] : cases) EXPECT_EQ(valueError(text), error) << text;
 }
 
 TEST(MofReader, ReadsCharacters) {

@@ -17,6 +17,7 @@
 #include <thread>
 
 #include "tests/support/CimValues.h"
+#include "tests/support/ManyTexts.h"
 #include "tests/support/Matchers.h"
 #include "tests/support/RecordingLogger.h"
 #include "tests/support/World.h"
@@ -313,16 +314,12 @@ TEST_F(InterfaceFileTest, AComposedLineIsWrittenWholeWhateverItsLength) {
 }
 
 TEST_F(InterfaceFileTest, AListOfAHundredThousandElementsIsReadBack) {
-  std::vector<std::string> elements;
-  std::string value;
-  for (int i = 0; i < 100000; ++i) {
-    elements.push_back("2001:db8::" + std::to_string(i));
-    value += elements.back() + " ";
-  }
-  EXPECT_TRUE(sameBytes("DNSSERVERS=" + value + "\n", afterModifyDNSValue("DNSSERVERS=\n", "DNSSERVERS", value)));
+  const ManyTexts many("2001:db8::");
+  EXPECT_TRUE(
+      sameBytes("DNSSERVERS=" + many.line + "\n", afterModifyDNSValue("DNSSERVERS=\n", "DNSSERVERS", many.line)));
   std::vector<std::string> values;
   readList(path_, "DNSSERVERS", values);
-  EXPECT_EQ(elements, values);
+  EXPECT_EQ(many.texts, values);
 }
 
 // --- hostile files

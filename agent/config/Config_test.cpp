@@ -3,10 +3,16 @@
 #include <gtest/gtest.h>
 #include <stdlib.h>
 
+#include <string>
+#include <utility>
+#include <vector>
+
 #include "agent/testing/TemporaryDirectory.h"
 
 namespace zorva::agent {
 namespace {
+
+using Cases = std::vector<std::pair<std::string, std::string>>;
 
 using testing::TemporaryDirectory;
 
@@ -81,32 +87,39 @@ TEST_F(ConfigTest, PathsAreTakenFromTheDirectoryOfTheFile) {
 }
 
 TEST_F(ConfigTest, AnUnknownTableOrKeyIsNamedWithItsLine) {
-  EXPECT_EQ(wrong("[agent]\n\ndata_dri = 1\n"), "agent.toml:3: agent.data_dri: is not a known key");
-  EXPECT_EQ(wrong("[agnet]\n"), "agent.toml:1: agnet: is not a known table or key");
-  EXPECT_EQ(wrong("level = 1\n"), "agent.toml:1: level: is not a known table or key");
-  EXPECT_EQ(wrong("[log]\n\"a\\nb\" = 1\n"), "agent.toml:2: log.a\\nb: is not a known key");
+  const Cases cases = {
+      {"[agent]\n\ndata_dri = 1\n", "agent.toml:3: agent.data_dri: is not a known key"},
+      {"[agnet]\n", "agent.toml:1: agnet: is not a known table or key"},
+      {"level = 1\n", "agent.toml:1: level: is not a known table or key"},
+      {"[log]\n\"a\\nb\" = 1\n", "agent.toml:2: log.a\\nb: is not a known key"},
+  };
+  for (const auto& [text, error] : cases) EXPECT_EQ(wrong(text), error) << text;
 }
 
 TEST_F(ConfigTest, AWrongTypeIsNamedWithItsLine) {
-  EXPECT_EQ(wrong("[agent]\ndata_dir = 7\n"), "agent.toml:2: agent.data_dir: expected a text in quotes");
-  EXPECT_EQ(wrong("[log]\nlevel = \"6000\"\n"), "agent.toml:2: log.level: expected a whole number");
-  EXPECT_EQ(wrong("[log]\nlevel = 1.5\n"), "agent.toml:2: log.level: expected a whole number");
-  EXPECT_EQ(wrong("[log]\ntrace_level = 99999999999\n"), "agent.toml:2: log.trace_level: is out of range");
-  EXPECT_EQ(wrong("[tree]\ninclude_loopback = 1\n"), "agent.toml:2: tree.include_loopback: expected true or false");
-  EXPECT_EQ(wrong("agent = 1\n"), "agent.toml:1: agent: expected a table");
+  const Cases cases = {
+      {"[agent]\ndata_dir = 7\n", "agent.toml:2: agent.data_dir: expected a text in quotes"},
+      {"[log]\nlevel = \"6000\"\n", "agent.toml:2: log.level: expected a whole number"},
+      {"[log]\nlevel = 1.5\n", "agent.toml:2: log.level: expected a whole number"},
+      {"[log]\ntrace_level = 99999999999\n", "agent.toml:2: log.trace_level: is out of range"},
+      {"[tree]\ninclude_loopback = 1\n", "agent.toml:2: tree.include_loopback: expected true or false"},
+      {"agent = 1\n", "agent.toml:1: agent: expected a table"},
+  };
+  for (const auto& [text, error] : cases) EXPECT_EQ(wrong(text), error) << text;
 }
 
 TEST_F(ConfigTest, AWrongValueIsNamedWithItsLine) {
-  EXPECT_EQ(wrong("[tree]\nsource = \"hots\"\n"), "agent.toml:2: tree.source: expected \"host\" or \"file\"");
-  EXPECT_EQ(wrong("[tree]\nsource = \"file\"\n"), "agent.toml:2: tree.source: \"file\" needs tree.file as well");
-  EXPECT_EQ(wrong("[tree]\napply = \"both\"\n"), "agent.toml:2: tree.apply: expected \"overlay\" or \"host\"");
-  EXPECT_EQ(wrong("[agent]\ndata_dir = \"\"\n"), "agent.toml:2: agent.data_dir: must not be empty");
-  EXPECT_EQ(wrong("[agent]\ndata_dir = \"a\\u0000b\"\n"), "agent.toml:2: agent.data_dir: must not hold a NUL");
-  EXPECT_EQ(wrong("[agent]\nsystem_name = \"a\\nb\"\n"),
-            "agent.toml:2: agent.system_name: must not hold control characters");
-  EXPECT_EQ(wrong("[agent]\nlanguage = \"\"\n"), "agent.toml:2: agent.language: expected a language such as \"en\"");
-  EXPECT_EQ(wrong("[log]\ntarget = \"\"\n"),
-            "agent.toml:2: log.target: expected \"stderr\", \"syslog\", \"off\" or a path");
+  const Cases cases = {
+      {"[tree]\nsource = \"hots\"\n", "agent.toml:2: tree.source: expected \"host\" or \"file\""},
+      {"[tree]\nsource = \"file\"\n", "agent.toml:2: tree.source: \"file\" needs tree.file as well"},
+      {"[tree]\napply = \"both\"\n", "agent.toml:2: tree.apply: expected \"overlay\" or \"host\""},
+      {"[agent]\ndata_dir = \"\"\n", "agent.toml:2: agent.data_dir: must not be empty"},
+      {"[agent]\ndata_dir = \"a\\u0000b\"\n", "agent.toml:2: agent.data_dir: must not hold a NUL"},
+      {"[agent]\nsystem_name = \"a\\nb\"\n", "agent.toml:2: agent.system_name: must not hold control characters"},
+      {"[agent]\nlanguage = \"\"\n", "agent.toml:2: agent.language: expected a language such as \"en\""},
+      {"[log]\ntarget = \"\"\n", "agent.toml:2: log.target: expected \"stderr\", \"syslog\", \"off\" or a path"},
+  };
+  for (const auto& [text, error] : cases) EXPECT_EQ(wrong(text), error) << text;
 }
 
 TEST_F(ConfigTest, SettingsAreAppliedToTheHostOnlyWhereThatIsAskedFor) {

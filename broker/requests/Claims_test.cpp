@@ -16,12 +16,9 @@ using ::testing::IsEmpty;
 class ClaimsTest : public ::testing::Test {
  protected:
   ClaimsTest() {
-    BrokerOptions options;
-    options.registry = ProviderRegistry();
-    const char* library = "zorvabrokertestprovider";
-    options.registry.add({"T_Thing", "Thing", library, InstanceMi});
-    options.registry.add({"T_Calling", "Calling", library, InstanceMi});
-    options.providerDirectory = ZORVA_LIB_DIR;
+    BrokerOptions options =
+        testing::testOptions(ZORVA_LIB_DIR, {testing::testProvider("T_Thing", "Thing", InstanceMi),
+                                             testing::testProvider("T_Calling", "Calling", InstanceMi)});
     options.claim = [this](Access access, std::string_view className, const ObjectPath* changed) {
       return claim(access, className, changed);
     };

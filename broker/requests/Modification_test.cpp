@@ -26,13 +26,10 @@ class ModificationTest : public ::testing::Test {
 
   /// A broker whose provider leaves the properties `keeps` unchanged if a modification lacks them.
   void start(const std::vector<std::string>& keeps) {
-    BrokerOptions options;
-    options.registry = ProviderRegistry();
-    ProviderEntry things{"T_Thing", "Thing", "zorvabrokertestprovider", InstanceMi};
+    ProviderEntry things = testing::testProvider("T_Thing", "Thing", InstanceMi);
     things.keeps = keeps;
-    options.registry.add(things);
-    options.registry.add({"T_Trouble", "Trouble", "zorvabrokertestprovider", InstanceMi});
-    options.providerDirectory = ZORVA_LIB_DIR;
+    BrokerOptions options =
+        testing::testOptions(ZORVA_LIB_DIR, {things, testing::testProvider("T_Trouble", "Trouble", InstanceMi)});
     options.log = [this](LogLevel, std::string_view text) {
       const std::lock_guard lock(mutex_);
       lines_.emplace_back(text);

@@ -4,7 +4,10 @@
 
 #include <memory>
 #include <stdexcept>
+#include <string>
+#include <vector>
 
+#include "broker/core/BrokerOptions.h"
 #include "schema/ClassRepository.h"
 #include "schema/Mof.h"
 
@@ -64,6 +67,20 @@ inline std::shared_ptr<const schema::ClassRepository> testClasses() {
   const auto outcome = schema::parseMof(kTestClasses, "test.mof", sink);
   if (!outcome) throw std::runtime_error(outcome.error().text());
   return repository;
+}
+
+/// A provider of the test library that serves a class.
+inline ProviderEntry testProvider(const std::string& className, const std::string& prefix, unsigned kinds) {
+  return {className, prefix, "zorvabrokertestprovider", kinds};
+}
+
+/// The options of a broker with these providers only; `libraries` is the directory of the test library.
+inline BrokerOptions testOptions(const std::string& libraries, const std::vector<ProviderEntry>& providers) {
+  BrokerOptions options;
+  options.registry = ProviderRegistry();
+  for (const ProviderEntry& provider : providers) options.registry.add(provider);
+  options.providerDirectory = libraries;
+  return options;
 }
 
 }  // namespace zorva::broker::testing

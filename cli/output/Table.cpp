@@ -4,6 +4,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <array>
 #include <cstdlib>
 #include <string_view>
 #include <utility>
@@ -17,23 +18,11 @@ namespace {
 constexpr std::size_t kGap = 2;        // blanks between columns
 constexpr std::size_t kNarrowest = 8;  // no column is made narrower than this
 
-const char* escapeOf(Style style) noexcept {
-  switch (style) {
-    case Style::Heading:
-      return "\033[1m";
-    case Style::Good:
-      return "\033[32m";
-    case Style::Warning:
-      return "\033[33m";
-    case Style::Bad:
-      return "\033[31m";
-    case Style::Faint:
-      return "\033[2m";
-    case Style::Plain:
-      break;
-  }
-  return "";
-}
+// The escape sequence of each Style, in the order of their declaration.
+constexpr std::array kEscapes = {"", "\033[1m", "\033[32m", "\033[33m", "\033[31m", "\033[2m"};
+static_assert(kEscapes.size() == static_cast<std::size_t>(Style::Faint) + 1, "one for each Style");
+
+const char* escapeOf(Style style) noexcept { return kEscapes[static_cast<std::size_t>(style)]; }
 
 std::size_t terminalWidth() noexcept {
   winsize size{};

@@ -29,6 +29,13 @@ class AssociationTest : public ::testing::Test {
   explicit AssociationTest(const Provider& provider)
       : under(provider), instances(under.createInstanceMI, broker), associations(under.createAssociationMI, broker) {}
 
+  /// The broker serves these objects of another provider's class.
+  void serve(const char* className, Path (*pathOf)(const std::string&), const Names& names) {
+    std::vector<Path> paths;
+    for (const std::string& name : names) paths.push_back(pathOf(name));
+    broker.serve(className, objectsOf(paths));
+  }
+
   Path associationClass() const { return Path(under.className); }
   Path pairOf(const Path& left, const Path& right) const {
     return associationClass().key(under.leftRole, ref(left)).key(under.rightRole, ref(right));

@@ -5,17 +5,10 @@
 #include <algorithm>
 #include <string_view>
 
+namespace broker = zorva::broker;
+
 namespace ZV::Test {
 namespace {
-
-using zorva::broker::AssociationFilter;
-using zorva::broker::Instance;
-using zorva::broker::MethodResult;
-using zorva::broker::NamedValue;
-using zorva::broker::ObjectPath;
-using zorva::broker::Selection;
-using zorva::broker::Status;
-using zorva::broker::Value;
 
 constexpr const char* kSpace = "root/cimv2";
 constexpr const char* kClasses[] = {
@@ -54,14 +47,14 @@ Number Client::chance(Number count) {
 
 std::string Client::writtenName() { return kWrittenNames[chance(std::size(kWrittenNames))]; }
 
-ObjectPath Client::anyObject() { return known_.empty() ? ObjectPath() : known_[chance(known_.size())]; }
+broker::ObjectPath Client::anyObject() { return known_.empty() ? broker::ObjectPath() : known_[chance(known_.size())]; }
 
 void Client::complain(const std::string& what) {
   if (load_.problems++ < kMostComplaints) ADD_FAILURE() << what;
 }
 
 // An association that pairs the first of the host's settings ends with an exception if there is none.
-void Client::checkStatus(const Status& status, const std::string& request, std::initializer_list<int> codes) {
+void Client::checkStatus(const broker::Status& status, const std::string& request, std::initializer_list<int> codes) {
   if (status.ok() || std::find(codes.begin(), codes.end(), status.rc) != codes.end()) return;
   const bool lacksSettings = status.rc == kFailed && request.find("GenOrderedComponent") != std::string::npos &&
                              status.message.find("_M_range_check") != std::string::npos;
@@ -69,10 +62,10 @@ void Client::checkStatus(const Status& status, const std::string& request, std::
   complain(request + ": " + std::to_string(status.rc) + " " + status.message);
 }
 
-void Client::checkPath(const ObjectPath& path) {
+void Client::checkPath(const broker::ObjectPath& path) {
   ++load_.objects;
   if (path.className.empty() || path.nameSpace != kSpace || path.keys.empty()) complain("a path of " + path.className);
-  for (const NamedValue& key : path.keys) {
+  for (const broker::NamedValue& key : path.keys) {
     if (key.value.isNull || !isPrintable(key.value.asText())) complain(path.className + ": key " + key.name);
   }
   if (known_.size() < kMostKnown) {
@@ -83,10 +76,10 @@ void Client::checkPath(const ObjectPath& path) {
 }
 
 // The node's values are written as a whole. A file is not: a reader may find it empty or incomplete.
-void Client::checkTexts(const Instance& instance) {
+void Client::checkTexts(const broker::Instance& instance) {
   const bool isOfFile = instance.path.className == "ZORVA_DNSSettingData";
   for (const char* name : {"DomainName", "Hostname", "RequestedHostname"}) {
-    const Value* value = instance.property(name);
+    const broker::Value* value = instance.property(name);
     if (value == nullptr || value->isNull) continue;
     const std::string text(value->asText());
     const auto isOne = [&](const std::string& written) {
@@ -99,7 +92,7 @@ void Client::checkTexts(const Instance& instance) {
 }
 
 zorva::broker::InstanceSink Client::instances() {
-  return [this](const Instance& instance) {
+  return [this](const broker::Instance& instance) {
     if (instance.declaration == nullptr) complain("an instance without class");
     checkPath(instance.path);
     if (instance.path.className.starts_with("ZORVA_DNS")) checkTexts(instance);
@@ -108,18 +101,19 @@ zorva::broker::InstanceSink Client::instances() {
 }
 
 zorva::broker::PathSink Client::paths() {
-  return [this](const ObjectPath& path) {
+  return [this](const broker::ObjectPath& path) {
     checkPath(path);
     return true;
   };
 }
 
-std::vector<ObjectPath> Client::names(const char* className) {
-  std::vector<ObjectPath> all;
-  const Status status = load_.broker.enumerateInstanceNames(kSpace, className, [&](const ObjectPath& path) {
-    all.push_back(path);
-    return true;
-  });
+std::vector<broker::ObjectPath> Client::names(const char* className) {
+  std::vector<broker::ObjectPath> all;
+  const broker::Status status =
+      load_.broker.enumerateInstanceNames(kSpace, className, [&](const broker::ObjectPath& path) {
+        all.push_back(path);
+        return true;
+      });
   checkStatus(status, className, {});
   return all;
 }
@@ -127,38 +121,39 @@ std::vector<ObjectPath> Client::names(const char* className) {
 void Client::read() {
   ++load_.reads;
   const char* const className = kClasses[chance(std::size(kClasses))];
-  const Status status = chance(2) == 0 ? load_.broker.enumerateInstances(kSpace, className, Selection(), instances())
-                                       : load_.broker.enumerateInstanceNames(kSpace, className, paths());
+  const broker::Status status =
+      chance(2) == 0 ? load_.broker.enumerateInstances(kSpace, className, broker::Selection(), instances())
+                     : load_.broker.enumerateInstanceNames(kSpace, className, paths());
   checkStatus(status, className, {});
 }
 
 void Client::readOne() {
-  const ObjectPath path = anyObject();
+  const broker::ObjectPath path = anyObject();
   if (path.className.empty()) return read();
   ++load_.reads;
-  Instance instance;
-  const Status status = load_.broker.getInstance(path, Selection(), instance);
+  broker::Instance instance;
+  const broker::Status status = load_.broker.getInstance(path, broker::Selection(), instance);
   checkStatus(status, "GetInstance of " + path.className, {kNotFound});
   if (status.ok()) instances()(instance);
 }
 
 void Client::traverse() {
-  const ObjectPath path = anyObject();
+  const broker::ObjectPath path = anyObject();
   if (path.className.empty()) return read();
   ++load_.traversals;
   const std::size_t associations = std::size(kClasses) - kPlainClasses;
-  AssociationFilter filter;
+  broker::AssociationFilter filter;
   if (chance(2) == 0) filter.associationClass = kClasses[kPlainClasses + chance(associations)];
-  Status status;
+  broker::Status status;
   switch (chance(4)) {
     case 0:
-      status = load_.broker.associators(path, filter, Selection(), instances());
+      status = load_.broker.associators(path, filter, broker::Selection(), instances());
       break;
     case 1:
       status = load_.broker.associatorNames(path, filter, paths());
       break;
     case 2:
-      status = load_.broker.references(path, filter, Selection(), instances());
+      status = load_.broker.references(path, filter, broker::Selection(), instances());
       break;
     default:
       status = load_.broker.referenceNames(path, filter, paths());
@@ -168,39 +163,42 @@ void Client::traverse() {
 
 void Client::change() {
   const char* const className = std::array{kClasses[0], kClasses[2], kClasses[3]}[chance(3U)];
-  const std::vector<ObjectPath> all = names(className);
+  const std::vector<broker::ObjectPath> all = names(className);
   if (all.empty()) return;
   ++load_.changes;
-  Instance instance;
+  broker::Instance instance;
   instance.path = all[chance(all.size())];
-  const auto set = [&](const char* name, Value value) { instance.properties.push_back({name, std::move(value)}); };
-  if (className == kClasses[0]) set("Hostname", Value::text(writtenName()));
-  if (className == kClasses[2]) set("RequestedHostname", Value::text(writtenName()));
-  if (className != kClasses[3]) set("DomainName", Value::text(writtenName()));
-  if (className == kClasses[2]) set("DNSServerAddresses", Value::textArray({"192.0.2.1", "192.0.2.2"}));
-  if (className != kClasses[2]) set("DNSSuffixesToAppend", Value::textArray({writtenName(), writtenName()}));
-  if (className != kClasses[0]) set("ConfigurationName", Value::text("configuration"));
-  const Status status = load_.broker.modifyInstance(instance, std::nullopt);
+  const auto set = [&](const char* name, broker::Value value) {
+    instance.properties.push_back({name, std::move(value)});
+  };
+  if (className == kClasses[0]) set("Hostname", broker::Value::text(writtenName()));
+  if (className == kClasses[2]) set("RequestedHostname", broker::Value::text(writtenName()));
+  if (className != kClasses[3]) set("DomainName", broker::Value::text(writtenName()));
+  if (className == kClasses[2]) set("DNSServerAddresses", broker::Value::textArray({"192.0.2.1", "192.0.2.2"}));
+  if (className != kClasses[2]) set("DNSSuffixesToAppend", broker::Value::textArray({writtenName(), writtenName()}));
+  if (className != kClasses[0]) set("ConfigurationName", broker::Value::text("configuration"));
+  const broker::Status status = load_.broker.modifyInstance(instance, std::nullopt);
   // The interface of a setting may be removed by now.
   checkStatus(status, std::string("ModifyInstance of ") + className, {kFailed, kNotFound});
 }
 
 void Client::invoke() {
-  const std::vector<ObjectPath> all = names(kClasses[0]);
+  const std::vector<broker::ObjectPath> all = names(kClasses[0]);
   if (all.empty()) return;
   ++load_.methods;
   struct Method {
     const char* name;
-    NamedValue argument;
+    broker::NamedValue argument;
   };
   const Method methods[] = {
-      {"SetDNSDomain", {"DNSDomain", Value::text(writtenName())}},
-      {"SetDNSServerSearchOrder", {"DNSServerSearchOrder", Value::textArray({"192.0.2.1"})}},
-      {"SetDNSSuffixSearchOrder", {"DNSDomainSuffixSearchOrder", Value::textArray({writtenName()})}},
+      {"SetDNSDomain", {"DNSDomain", broker::Value::text(writtenName())}},
+      {"SetDNSServerSearchOrder", {"DNSServerSearchOrder", broker::Value::textArray({"192.0.2.1"})}},
+      {"SetDNSSuffixSearchOrder", {"DNSDomainSuffixSearchOrder", broker::Value::textArray({writtenName()})}},
   };
   const Method& method = methods[chance(std::size(methods))];
-  MethodResult result;
-  const Status status = load_.broker.invokeMethod(all[chance(all.size())], method.name, {method.argument}, result);
+  broker::MethodResult result;
+  const broker::Status status =
+      load_.broker.invokeMethod(all[chance(all.size())], method.name, {method.argument}, result);
   checkStatus(status, method.name, {});
   const auto* value = std::get_if<std::uint64_t>(&result.returnValue.scalar);
   if (value == nullptr || *value > 1) complain(std::string(method.name) + " gives neither 0 nor 1");
