@@ -110,6 +110,15 @@ Status inRequest(BrokerCore& core, const Caller& caller, CMPIFlags flags, Operat
   }
 }
 
+/// The result that `ask` fills, unless its status is a failure.
+template <typename Result, typename Ask>
+Expected<Result, Status> resultOf(Ask ask) {
+  Result result;
+  Status status = ask(result);
+  if (!status.ok()) return unexpected(std::move(status));
+  return result;
+}
+
 }  // namespace
 
 Broker::Broker(std::shared_ptr<const schema::ClassRepository> classes, BrokerOptions options)
@@ -134,28 +143,32 @@ Status Broker::enumerateInstanceNames(std::string_view nameSpace, std::string_vi
   });
 }
 
-Status Broker::getInstance(const ObjectPath& path, const Selection& selection, Instance& instance,
-                           const Caller& caller) {
-  return inRequest(*core_, caller, flagsOf(selection), [&](Request& request) {
-    PathObject* name = nullptr;
-    Status status = makePath(request.arena(), path, true, name);
-    if (!status.ok()) return status;
-    OneTaker taker(&instance, nullptr);
-    Shape shape = shapeOf(selection);
-    shape.deepInheritance = true;
-    return request.get(*name, shape, taker);
+Expected<Instance, Status> Broker::getInstance(const ObjectPath& path, const Selection& selection,
+                                               const Caller& caller) {
+  return resultOf<Instance>([&](Instance& instance) {
+    return inRequest(*core_, caller, flagsOf(selection), [&](Request& request) {
+      PathObject* name = nullptr;
+      Status status = makePath(request.arena(), path, true, name);
+      if (!status.ok()) return status;
+      OneTaker taker(&instance, nullptr);
+      Shape shape = shapeOf(selection);
+      shape.deepInheritance = true;
+      return request.get(*name, shape, taker);
+    });
   });
 }
 
-Status Broker::createInstance(const Instance& instance, ObjectPath& created, const Caller& caller) {
-  return inRequest(*core_, caller, 0, [&](Request& request) {
-    PathObject* name = nullptr;
-    InstanceObject* object = nullptr;
-    Status status = makePath(request.arena(), instance.path, true, name);
-    if (status.ok()) status = makeInstance(request.arena(), *name, instance, object);
-    if (!status.ok()) return status;
-    OneTaker taker(nullptr, &created);
-    return request.create(*object->path(request.arena()), *object, taker);
+Expected<ObjectPath, Status> Broker::createInstance(const Instance& instance, const Caller& caller) {
+  return resultOf<ObjectPath>([&](ObjectPath& created) {
+    return inRequest(*core_, caller, 0, [&](Request& request) {
+      PathObject* name = nullptr;
+      InstanceObject* object = nullptr;
+      Status status = makePath(request.arena(), instance.path, true, name);
+      if (status.ok()) status = makeInstance(request.arena(), *name, instance, object);
+      if (!status.ok()) return status;
+      OneTaker taker(nullptr, &created);
+      return request.create(*object->path(request.arena()), *object, taker);
+    });
   });
 }
 
@@ -286,30 +299,32 @@ Status makeArguments(Arena& arena, const schema::ClassMethod& method, const std:
 
 }  // namespace
 
-Status Broker::invokeMethod(const ObjectPath& path, std::string_view method, const std::vector<NamedValue>& input,
-                            MethodResult& result, const Caller& caller) {
-  return inRequest(*core_, caller, 0, [&](Request& request) {
-    PathObject* name = nullptr;
-    Status status = makeSource(request.arena(), path, CMPI_RC_ERR_NOT_FOUND, name);
-    if (status.ok()) status = refuseControlCharacters(input);
-    if (!status.ok()) return status;
-    EntryList arguments;
-    // If the class has no such method, the request reports it.
-    if (const schema::ClassMethod* declared = name->info->declared().findMethod(method)) {
-      status = checkCall(path, *name, *declared, input);
-      if (status.ok()) status = makeArguments(request.arena(), *declared, input, arguments);
+Expected<MethodResult, Status> Broker::invokeMethod(const ObjectPath& path, std::string_view method,
+                                                    const std::vector<NamedValue>& input, const Caller& caller) {
+  return resultOf<MethodResult>([&](MethodResult& result) {
+    return inRequest(*core_, caller, 0, [&](Request& request) {
+      PathObject* name = nullptr;
+      Status status = makeSource(request.arena(), path, CMPI_RC_ERR_NOT_FOUND, name);
+      if (status.ok()) status = refuseControlCharacters(input);
       if (!status.ok()) return status;
-    }
-    EntryList output;
-    CMPIData value = nullData(CMPI_null);
-    status = request.invoke(*name, method, arguments, value, output);
-    fillValue(value, result.returnValue);
-    result.output.resize(output.size());
-    for (std::uint32_t i = 0; i < output.size(); ++i) {
-      result.output[i].name = output[i].name->view();
-      fillValue(output[i].data, result.output[i].value);
-    }
-    return status;
+      EntryList arguments;
+      // If the class has no such method, the request reports it.
+      if (const schema::ClassMethod* declared = name->info->declared().findMethod(method)) {
+        status = checkCall(path, *name, *declared, input);
+        if (status.ok()) status = makeArguments(request.arena(), *declared, input, arguments);
+        if (!status.ok()) return status;
+      }
+      EntryList output;
+      CMPIData value = nullData(CMPI_null);
+      status = request.invoke(*name, method, arguments, value, output);
+      fillValue(value, result.returnValue);
+      result.output.resize(output.size());
+      for (std::uint32_t i = 0; i < output.size(); ++i) {
+        result.output[i].name = output[i].name->view();
+        fillValue(output[i].data, result.output[i].value);
+      }
+      return status;
+    });
   });
 }
 
@@ -319,15 +334,17 @@ const schema::ClassRepository& Broker::classes() const noexcept { return core_->
 
 const ProviderRegistry& Broker::registry() const noexcept { return core_->registry(); }
 
-Status Broker::canonicalPath(const ObjectPath& path, ObjectPath& canonical) const {
-  return inRequest(*core_, {}, 0, [&](Request& request) {
-    PathObject* name = nullptr;
-    Status status = makePath(request.arena(), path, true, name);
-    if (!status.ok()) return status;
-    const Expected<PathObject*, Status> resolved = request.resolve(*name);
-    if (!resolved) return resolved.error();
-    fillPath(**resolved, canonical);
-    return status;
+Expected<ObjectPath, Status> Broker::canonicalPath(const ObjectPath& path) const {
+  return resultOf<ObjectPath>([&](ObjectPath& canonical) {
+    return inRequest(*core_, {}, 0, [&](Request& request) {
+      PathObject* name = nullptr;
+      Status status = makePath(request.arena(), path, true, name);
+      if (!status.ok()) return status;
+      const Expected<PathObject*, Status> resolved = request.resolve(*name);
+      if (!resolved) return resolved.error();
+      fillPath(**resolved, canonical);
+      return status;
+    });
   });
 }
 

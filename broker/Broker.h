@@ -21,6 +21,7 @@
 #include "broker/objects/Value.h"
 #include "broker/requests/Operations.h"
 #include "schema/ClassRepository.h"
+#include "util/Expected.h"
 #include "util/NotCopied.h"
 
 struct _CMPIBroker;
@@ -49,10 +50,10 @@ class Broker : util::NotCopied {
   /// One instance. Key values may be texts where the schema declares another type (an untyped KEYVALUE, a path text).
   /// They are converted to the key's type; a text for a reference is read as a path text. Keys may be missing: the
   /// provider decides. CIM_ERR_NOT_FOUND if the provider returns nothing.
-  Status getInstance(const ObjectPath& path, const Selection& selection, Instance& instance, const Caller& caller = {});
+  Expected<Instance, Status> getInstance(const ObjectPath& path, const Selection& selection, const Caller& caller = {});
 
-  /// `instance.path` names class and namespace. `created` gets the name of the new instance.
-  Status createInstance(const Instance& instance, ObjectPath& created, const Caller& caller = {});
+  /// `instance.path` names class and namespace. Returns the name of the new instance.
+  Expected<ObjectPath, Status> createInstance(const Instance& instance, const Caller& caller = {});
 
   /// Modifies the instance that `instance.path` names. `propertyList` limits the change (absent: all properties that
   /// `instance` has). The instance is read first. A property that the client does not name, or names with its current
@@ -85,8 +86,8 @@ class Broker : util::NotCopied {
   /// Calls an extrinsic method. Parameters are converted to the types that the schema declares. CIM_ERR_NOT_FOUND if
   /// the class does not exist. CIM_ERR_INVALID_PARAMETER for a parameter that the method lacks, that does not fit its
   /// type or is given twice, for a missing required one, and for a path without keys, unless the method is static.
-  Status invokeMethod(const ObjectPath& path, std::string_view method, const std::vector<NamedValue>& input,
-                      MethodResult& result, const Caller& caller = {});
+  Expected<MethodResult, Status> invokeMethod(const ObjectPath& path, std::string_view method,
+                                              const std::vector<NamedValue>& input, const Caller& caller = {});
 
   /// Opens all provider libraries now. Otherwise a request opens a library when it first needs it. Returns one sentence
   /// for each library that cannot be opened.
@@ -97,7 +98,7 @@ class Broker : util::NotCopied {
 
   /// `path` as the providers would see it: names in the schema's spelling, key values in the schema's types, in the
   /// order of the schema's keys. Fails as a request with that path does.
-  Status canonicalPath(const ObjectPath& path, ObjectPath& canonical) const;
+  Expected<ObjectPath, Status> canonicalPath(const ObjectPath& path) const;
 
   /// The broker as providers see it. Its functions make CMPI objects only within a request: this is for providers and
   /// for the tests of the function tables.

@@ -132,10 +132,12 @@ TEST_F(InteropTest, SetsNothingThatTheSchemaLacks) {
 }
 
 TEST_F(InteropTest, GetsTheProfileByItsName) {
-  broker::Instance instance;
-  EXPECT_TRUE(broker_->getInstance(profile(), {}, instance).ok());
-  EXPECT_EQ(instance.property("RegisteredName")->asText(), "Zorva DNS Client");
-  EXPECT_EQ(broker_->getInstance(profile("another"), {}, instance).rc, 6);
+  const auto found = broker_->getInstance(profile(), {});
+  ASSERT_TRUE(found) << found.error().message;
+  EXPECT_EQ(found->property("RegisteredName")->asText(), "Zorva DNS Client");
+  const auto none = broker_->getInstance(profile("another"), {});
+  ASSERT_FALSE(none);
+  EXPECT_EQ(none.error().rc, 6);
   EXPECT_EQ(broker_->deleteInstance(profile()).rc, 7);
 }
 
@@ -155,12 +157,14 @@ TEST_F(InteropTest, LinksNamespacesToTheManager) {
 }
 
 TEST_F(InteropTest, ReturnsTheCentralInstances) {
-  broker::MethodResult result;
-  EXPECT_TRUE(broker_->invokeMethod(profile(), "GetCentralInstances", {}, result).ok());
-  EXPECT_EQ(std::get<std::uint64_t>(result.returnValue.scalar), 0U);
-  ASSERT_EQ(result.output.size(), 1U);
-  EXPECT_TRUE(result.output[0].value.isArray);
-  EXPECT_EQ(broker_->invokeMethod(profile(), "CloseConformantInstances", {}, result).rc, 16);
+  const auto result = broker_->invokeMethod(profile(), "GetCentralInstances", {});
+  ASSERT_TRUE(result) << result.error().message;
+  EXPECT_EQ(std::get<std::uint64_t>(result->returnValue.scalar), 0U);
+  ASSERT_EQ(result->output.size(), 1U);
+  EXPECT_TRUE(result->output[0].value.isArray);
+  const auto refused = broker_->invokeMethod(profile(), "CloseConformantInstances", {});
+  ASSERT_FALSE(refused);
+  EXPECT_EQ(refused.error().rc, 16);
 }
 
 }  // namespace

@@ -128,14 +128,12 @@ bool hasKeys(const broker::ObjectPath& name, const broker::ObjectPath& given) {
 /// used; else the provider decides.
 void completeKeys(const Operation& operation, broker::ObjectPath& path) {
   const schema::Class* declared = operation.classes().find(path.className);
-  broker::ObjectPath given;
-  if (declared == nullptr || path.keys.empty() || path.keys.size() >= declared->keys().size() ||
-      !operation.broker.canonicalPath(path, given).ok()) {
-    return;
-  }
+  if (declared == nullptr || path.keys.empty() || path.keys.size() >= declared->keys().size()) return;
+  const auto given = operation.broker.canonicalPath(path);
+  if (!given) return;
   std::vector<broker::ObjectPath> found;
   const broker::PathSink look = [&](const broker::ObjectPath& name) {
-    if (hasKeys(name, given)) found.push_back(name);
+    if (hasKeys(name, *given)) found.push_back(name);
     return found.size() < 2;
   };
   const Status status =
@@ -211,13 +209,12 @@ Status invokeMethod(Operation& operation) {
   if (!status.ok()) return status;
   std::vector<broker::NamedValue> input = operation.call.input;
   for (broker::NamedValue& argument : input) canonicalizeValue(operation, argument.value);
-  broker::MethodResult result;
-  status = operation.broker.invokeMethod(path, operation.call.name, input, result, operation.caller);
-  if (!status.ok()) return status;
-  noteCall(operation, path, result);
+  const auto result = operation.broker.invokeMethod(path, operation.call.name, input, operation.caller);
+  if (!result) return result.error();
+  noteCall(operation, path, *result);
   std::string& out = operation.writer.out();
-  if (!result.returnValue.isNull) cimxml::appendReturnValue(out, result.returnValue);
-  for (const broker::NamedValue& value : result.output) {
+  if (!result->returnValue.isNull) cimxml::appendReturnValue(out, result->returnValue);
+  for (const broker::NamedValue& value : result->output) {
     cimxml::appendParameter(out, value);
     operation.writer.drainIfFull();
   }

@@ -25,11 +25,11 @@ Status getInstance(Operation& operation) {
   const broker::Selection selection = takeSelection(arguments, true);
   Status status = arguments.status();
   if (status.ok()) status = canonicalizePath(operation, path);
-  Instance instance;
-  if (status.ok()) status = operation.broker.getInstance(path, selection, instance, operation.caller);
   if (!status.ok()) return status;
+  const auto instance = operation.broker.getInstance(path, selection, operation.caller);
+  if (!instance) return instance.error();
   operation.writer.beginReturnValue();
-  cimxml::appendInstance(operation.writer.out(), instance, detailOf(operation, selection));
+  cimxml::appendInstance(operation.writer.out(), *instance, detailOf(operation, selection));
   operation.writer.endReturnValue();
   return {};
 }
@@ -85,12 +85,11 @@ Status createInstance(Operation& operation) {
   if (!status.ok()) return status;
   instance.path.nameSpace = operation.nameSpace;
   canonicalizeProperties(operation, instance);
-  ObjectPath created;
-  status = operation.broker.createInstance(instance, created, operation.caller);
-  if (!status.ok()) return status;
-  noteChange(operation, "created", created);
+  const auto created = operation.broker.createInstance(instance, operation.caller);
+  if (!created) return created.error();
+  noteChange(operation, "created", *created);
   operation.writer.beginReturnValue();
-  cimxml::appendInstanceName(operation.writer.out(), created);
+  cimxml::appendInstanceName(operation.writer.out(), *created);
   operation.writer.endReturnValue();
   return {};
 }
@@ -153,10 +152,9 @@ Status getProperty(Operation& operation) {
   const schema::ClassProperty* property = *found;
   broker::Selection selection;
   selection.propertyList = {property->name};
-  Instance instance;
-  status = operation.broker.getInstance(path, selection, instance, operation.caller);
-  if (!status.ok()) return status;
-  const broker::Value* value = instance.property(property->name);
+  const auto instance = operation.broker.getInstance(path, selection, operation.caller);
+  if (!instance) return instance.error();
+  const broker::Value* value = instance->property(property->name);
   if (value == nullptr || value->isNull) return {};  // null is no IRETURNVALUE at all
   operation.writer.beginReturnValue();
   cimxml::appendValue(operation.writer.out(), *value);

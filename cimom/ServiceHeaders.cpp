@@ -72,15 +72,15 @@ Expected<void, HttpRefusal> checkVersion(const std::optional<std::string>& versi
 
 /// Whether header and body have the same key values, as far as the schema can say.
 bool sameKeys(const broker::Broker& broker, const broker::ObjectPath& a, const broker::ObjectPath& b) {
-  broker::ObjectPath one;
-  broker::ObjectPath other;
+  const auto one = broker.canonicalPath(a);
+  const auto other = broker.canonicalPath(b);
   // The operation itself reports best what is wrong with a path.
-  if (!broker.canonicalPath(a, one).ok() || !broker.canonicalPath(b, other).ok()) return true;
-  if (one.keys.size() != other.keys.size()) return false;
-  for (std::size_t i = 0; i < one.keys.size(); ++i) {
-    if (one.keys[i].name != other.keys[i].name) return false;
-    const bool isReference = one.keys[i].value.type == schema::Type::Reference;
-    if (!isReference && one.keys[i].value != other.keys[i].value) return false;
+  if (!one || !other) return true;
+  if (one->keys.size() != other->keys.size()) return false;
+  for (std::size_t i = 0; i < one->keys.size(); ++i) {
+    if (one->keys[i].name != other->keys[i].name) return false;
+    const bool isReference = one->keys[i].value.type == schema::Type::Reference;
+    if (!isReference && one->keys[i].value != other->keys[i].value) return false;
   }
   return true;
 }

@@ -186,10 +186,9 @@ TEST_P(AssociationTable, EachIsFoundByItsName) {
   });
   Lines lines;
   for (const broker::ObjectPath& path : paths) {
-    broker::Instance association;
-    const broker::Status status = broker_->getInstance(path, {}, association);
-    EXPECT_TRUE(status.ok()) << status.message;
-    lines.push_back(lineOf(association));
+    const auto association = broker_->getInstance(path, {});
+    ASSERT_TRUE(association) << association.error().message;
+    lines.push_back(lineOf(*association));
   }
   EXPECT_THAT(lines, UnorderedElementsAreArray(GetParam().associations));
 }

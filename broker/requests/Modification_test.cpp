@@ -90,9 +90,9 @@ TEST_F(ModificationTest, AnEmptyListChangesNothing) {
 }
 
 TEST_F(ModificationTest, AWholeInstanceAsItIsChangesNothing) {
-  Instance instance;
-  instance.path = parsePathText("T_Thing.Name=\"a\"").value();
-  EXPECT_EQ(broker_->getInstance(instance.path, {}, instance).rc, 0);
+  const auto found = broker_->getInstance(parsePathText("T_Thing.Name=\"a\"").value(), {});
+  ASSERT_TRUE(found);
+  Instance instance = *found;
   EXPECT_EQ(modify(instance.properties).rc, 0);
   EXPECT_THAT(lines_, Not(Contains(StartsWith("ModifyInstance"))));
   for (Property& property : instance.properties) {

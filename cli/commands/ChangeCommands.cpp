@@ -117,11 +117,13 @@ void invokeMethod(const Globals& globals, const InvokeOptions& options) {
   input.reserve(assignments.size());
   for (const Assignment& assignment : assignments) input.push_back(parseParameter(method, assignment));
 
-  broker::MethodResult result;
-  const broker::Status status = session.cim().invokeMethod(path, method.name, input, result);
-  if (!status.ok()) throw operationFailure(method.name + " of " + shortPathText(path), status, parametersOf(method));
-  write(globals.output == OutputFormat::Json ? methodResultJson(result) + "\n" : methodTable(result, session.layout()));
-  if (const std::string value = valueText(result.returnValue, nullptr); value != "0" && !result.returnValue.isNull) {
+  const auto result = session.cim().invokeMethod(path, method.name, input);
+  if (!result) {
+    throw operationFailure(method.name + " of " + shortPathText(path), result.error(), parametersOf(method));
+  }
+  write(globals.output == OutputFormat::Json ? methodResultJson(*result) + "\n"
+                                             : methodTable(*result, session.layout()));
+  if (const std::string value = valueText(result->returnValue, nullptr); value != "0" && !result->returnValue.isNull) {
     throw Failure(ExitCode::Failed, method.name + " returned " + value);
   }
   // A method that sets something was asked to store it.

@@ -84,11 +84,10 @@ class Walk {
   std::string problemOf(const broker::ObjectPath& path, const std::string& name) {
     if (path.keys.empty()) return "its provider gives this end without keys, by design";
     if (isLarge() && isListed(path.className, name)) return {};
-    broker::Instance instance;
     broker::Selection keysOnly;
     keysOnly.propertyList.emplace();
-    const broker::Status status = session_.cim().getInstance(path, keysOnly, instance);
-    return status.ok() ? std::string() : operationFailure("GetInstance", status).what();
+    const auto instance = session_.cim().getInstance(path, keysOnly);
+    return instance ? std::string() : operationFailure("GetInstance", instance.error()).what();
   }
 
   bool isListed(const std::string& className, const std::string& name) {

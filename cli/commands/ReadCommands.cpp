@@ -48,12 +48,12 @@ void getInstance(const Globals& globals, const ReadOptions& options) {
   const auto writer = makeResultWriter(globals.output, session.layout(), Count::One, Results::Instances);
   const broker::ObjectPath path = resolvePath(session, options.target);
   const broker::Selection selection = selectionOf(session, options.properties, &session.classNamed(path.className));
-  broker::Instance instance;
-  const broker::Status status = session.cim().getInstance(path, selection, instance);
-  if (!status.ok()) {
-    throw operationFailure(options.target, status, "zorvactl names " + path.className + " lists what there is");
+  const auto instance = session.cim().getInstance(path, selection);
+  if (!instance) {
+    throw operationFailure(options.target, instance.error(),
+                           "zorvactl names " + path.className + " lists what there is");
   }
-  writer->add(instance);
+  writer->add(*instance);
   writer->finish();
 }
 

@@ -21,12 +21,12 @@ class LocalOperations : public Operations {
                                         const broker::PathSink& sink) override {
     return broker_.enumerateInstanceNames(nameSpace, className, sink);
   }
-  broker::Status getInstance(const broker::ObjectPath& path, const broker::Selection& selection,
-                             broker::Instance& instance) override {
-    broker::Status status = broker_.getInstance(path, selection, instance);
+  Expected<broker::Instance, broker::Status> getInstance(const broker::ObjectPath& path,
+                                                         const broker::Selection& selection) override {
+    auto instance = broker_.getInstance(path, selection);
     // In the order of the request, not the provider's.
-    if (status.ok()) instance.path.keys = path.keys;
-    return status;
+    if (instance) instance->path.keys = path.keys;
+    return instance;
   }
   broker::Status modifyInstance(const broker::Instance& instance,
                                 const std::optional<std::vector<std::string>>& propertyList) override {
@@ -48,12 +48,12 @@ class LocalOperations : public Operations {
                                 const broker::PathSink& sink) override {
     return broker_.referenceNames(path, filter, sink);
   }
-  broker::Status invokeMethod(const broker::ObjectPath& path, std::string_view method,
-                              const std::vector<broker::NamedValue>& input, broker::MethodResult& result) override {
-    return broker_.invokeMethod(path, method, input, result);
+  Expected<broker::MethodResult, broker::Status> invokeMethod(const broker::ObjectPath& path, std::string_view method,
+                                                              const std::vector<broker::NamedValue>& input) override {
+    return broker_.invokeMethod(path, method, input);
   }
-  broker::Status canonicalPath(const broker::ObjectPath& path, broker::ObjectPath& canonical) override {
-    return broker_.canonicalPath(path, canonical);
+  Expected<broker::ObjectPath, broker::Status> canonicalPath(const broker::ObjectPath& path) override {
+    return broker_.canonicalPath(path);
   }
   const schema::Class* classNamed(std::string_view name) override { return broker_.classes().find(name); }
   const std::vector<broker::ProviderEntry>& served() const override { return broker_.registry().entries(); }

@@ -24,8 +24,8 @@ class Operations {
   virtual broker::Status enumerateInstanceNames(std::string_view nameSpace, std::string_view className,
                                                 const broker::PathSink& sink) = 0;
   /// The instance has all the keys of the request.
-  virtual broker::Status getInstance(const broker::ObjectPath& path, const broker::Selection& selection,
-                                     broker::Instance& instance) = 0;
+  virtual Expected<broker::Instance, broker::Status> getInstance(const broker::ObjectPath& path,
+                                                                 const broker::Selection& selection) = 0;
   /// Here, success is checked by reading again; a server may do so or not.
   virtual broker::Status modifyInstance(const broker::Instance& instance,
                                         const std::optional<std::vector<std::string>>& propertyList) = 0;
@@ -37,11 +37,12 @@ class Operations {
                                     const broker::Selection& selection, const broker::InstanceSink& sink) = 0;
   virtual broker::Status referenceNames(const broker::ObjectPath& path, const broker::AssociationFilter& filter,
                                         const broker::PathSink& sink) = 0;
-  virtual broker::Status invokeMethod(const broker::ObjectPath& path, std::string_view method,
-                                      const std::vector<broker::NamedValue>& input, broker::MethodResult& result) = 0;
+  virtual Expected<broker::MethodResult, broker::Status> invokeMethod(const broker::ObjectPath& path,
+                                                                      std::string_view method,
+                                                                      const std::vector<broker::NamedValue>& input) = 0;
 
   /// The path with names in the schema's spelling, key values in the schema's types and its namespace.
-  virtual broker::Status canonicalPath(const broker::ObjectPath& path, broker::ObjectPath& canonical) = 0;
+  virtual Expected<broker::ObjectPath, broker::Status> canonicalPath(const broker::ObjectPath& path) = 0;
 
   /// The class of that name, in any case; null if there is none.
   virtual const schema::Class* classNamed(std::string_view name) = 0;

@@ -167,23 +167,23 @@ broker::Status RemoteOperations::enumerateInstanceNames(std::string_view nameSpa
   return handOut(ask("EnumerateInstanceNames", in, call.message()), in, sink);
 }
 
-broker::Status RemoteOperations::getInstance(const broker::ObjectPath& path, const broker::Selection& selection,
-                                             broker::Instance& instance) {
+Expected<broker::Instance, broker::Status> RemoteOperations::getInstance(const broker::ObjectPath& path,
+                                                                         const broker::Selection& selection) {
   const std::string in = nameSpaceOr(path.nameSpace);
   IntrinsicCall call("GetInstance", in);
   call.instanceName("InstanceName", path)
       .boolean("LocalOnly", selection.localOnly)
       .propertyList(selection.propertyList);
   CimResponse response = ask("GetInstance", in, call.message());
-  if (response.status.ok() && response.instances.empty()) return {6, "the server gave no instance"};
-  if (!response.status.ok()) return response.status;
-  instance = std::move(response.instances.front());
+  if (!response.status.ok()) return unexpected(std::move(response.status));
+  if (response.instances.empty()) return unexpected(broker::Status{6, "the server gave no instance"});
+  broker::Instance instance = std::move(response.instances.front());
   // The response does not repeat the requested name.
   const std::string className = instance.path.className;
   instance.path = path;
   instance.path.className = className;
   instance.path.nameSpace = in;
-  return {};
+  return instance;
 }
 
 broker::Status RemoteOperations::modifyInstance(const broker::Instance& instance,
@@ -231,21 +231,20 @@ broker::Status RemoteOperations::referenceNames(const broker::ObjectPath& path, 
   return handOut(ask("ReferenceNames", in, call.message()), in, sink);
 }
 
-broker::Status RemoteOperations::invokeMethod(const broker::ObjectPath& path, std::string_view method,
-                                              const std::vector<broker::NamedValue>& input,
-                                              broker::MethodResult& result) {
+Expected<broker::MethodResult, broker::Status> RemoteOperations::invokeMethod(
+    const broker::ObjectPath& path, std::string_view method, const std::vector<broker::NamedValue>& input) {
   broker::ObjectPath object = path;
   object.host.clear();
   object.nameSpace = nameSpaceOr(path.nameSpace);
   CimResponse response = ask(method, broker::pathText(object), cimxml::methodCall(object, method, input));
-  result = std::move(response.method);
-  return response.status;
+  if (!response.status.ok()) return unexpected(std::move(response.status));
+  return std::move(response.method);
 }
 
-broker::Status RemoteOperations::canonicalPath(const broker::ObjectPath& path, broker::ObjectPath& canonical) {
+Expected<broker::ObjectPath, broker::Status> RemoteOperations::canonicalPath(const broker::ObjectPath& path) {
   const schema::Class* declared = classNamed(path.className);
-  if (declared == nullptr) return {5, "there is no class " + path.className};
-  canonical = path;
+  if (declared == nullptr) return unexpected(broker::Status{5, "there is no class " + path.className});
+  broker::ObjectPath canonical = path;
   canonical.nameSpace = nameSpaceOr(path.nameSpace);
   canonical.className = declared->name();
   canonical.keys.clear();
@@ -253,13 +252,15 @@ broker::Status RemoteOperations::canonicalPath(const broker::ObjectPath& path, b
     const broker::Value* given = path.key(key->name);
     if (given == nullptr) continue;
     const std::optional<broker::Value> value = keyValue(*given, *key);
-    if (!value) return {4, declared->name() + "." + key->name + ": its value is no path"};
+    if (!value) return unexpected(broker::Status{4, declared->name() + "." + key->name + ": its value is no path"});
     canonical.keys.push_back({key->name, *value});
   }
   for (const broker::NamedValue& key : path.keys) {
-    if (canonical.key(key.name) == nullptr) return {4, declared->name() + " has no key " + key.name};
+    if (canonical.key(key.name) == nullptr) {
+      return unexpected(broker::Status{4, declared->name() + " has no key " + key.name});
+    }
   }
-  return {};
+  return canonical;
 }
 
 const schema::Class* RemoteOperations::classNamed(std::string_view name) {

@@ -25,8 +25,8 @@ class RemoteOperations : public Operations {
                                     const broker::Selection& selection, const broker::InstanceSink& sink) override;
   broker::Status enumerateInstanceNames(std::string_view nameSpace, std::string_view className,
                                         const broker::PathSink& sink) override;
-  broker::Status getInstance(const broker::ObjectPath& path, const broker::Selection& selection,
-                             broker::Instance& instance) override;
+  Expected<broker::Instance, broker::Status> getInstance(const broker::ObjectPath& path,
+                                                         const broker::Selection& selection) override;
   broker::Status modifyInstance(const broker::Instance& instance,
                                 const std::optional<std::vector<std::string>>& propertyList) override;
   broker::Status associators(const broker::ObjectPath& path, const broker::AssociationFilter& filter,
@@ -37,9 +37,9 @@ class RemoteOperations : public Operations {
                             const broker::Selection& selection, const broker::InstanceSink& sink) override;
   broker::Status referenceNames(const broker::ObjectPath& path, const broker::AssociationFilter& filter,
                                 const broker::PathSink& sink) override;
-  broker::Status invokeMethod(const broker::ObjectPath& path, std::string_view method,
-                              const std::vector<broker::NamedValue>& input, broker::MethodResult& result) override;
-  broker::Status canonicalPath(const broker::ObjectPath& path, broker::ObjectPath& canonical) override;
+  Expected<broker::MethodResult, broker::Status> invokeMethod(const broker::ObjectPath& path, std::string_view method,
+                                                              const std::vector<broker::NamedValue>& input) override;
+  Expected<broker::ObjectPath, broker::Status> canonicalPath(const broker::ObjectPath& path) override;
   const std::vector<broker::ProviderEntry>& served() const override { return served_.entries(); }
   const schema::Class* classNamed(std::string_view name) override;
 

@@ -51,12 +51,12 @@ broker::Instance instanceToSend(const broker::Instance& found, const std::vector
 }
 
 broker::Instance fetched(Session& session, const broker::ObjectPath& path) {
-  broker::Instance instance;
-  const broker::Status status = session.cim().getInstance(path, {}, instance);
-  if (!status.ok()) {
-    throw operationFailure(shortPathText(path), status, "zorvactl names " + path.className + " lists what there is");
+  auto instance = session.cim().getInstance(path, {});
+  if (!instance) {
+    throw operationFailure(shortPathText(path), instance.error(),
+                           "zorvactl names " + path.className + " lists what there is");
   }
-  return instance;
+  return std::move(*instance);
 }
 
 /// A failure if there is no file for a change: then the value is equal only because the host has it too.

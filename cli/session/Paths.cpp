@@ -152,10 +152,11 @@ broker::ObjectPath resolvePath(Session& session, std::string_view text) {
   const broker::ObjectPath typed = readPath(text);
   requireThisHost(session, typed, text);
   const schema::Class& declared = session.classNamed(typed.className);
-  broker::ObjectPath given;
-  if (const broker::Status status = session.cim().canonicalPath(typed, given); !status.ok()) {
-    throw Failure(ExitCode::WrongUsage, printable(text) + ": " + printable(status.message));
+  const auto canonical = session.cim().canonicalPath(typed);
+  if (!canonical) {
+    throw Failure(ExitCode::WrongUsage, printable(text) + ": " + printable(canonical.error().message));
   }
+  const broker::ObjectPath& given = *canonical;
   requireClassesOfReferences(session, given);
   if (isServed(session, given) && isComplete(session, given, declared)) return given;
 

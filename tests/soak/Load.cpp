@@ -131,10 +131,9 @@ void Client::readOne() {
   const broker::ObjectPath path = anyObject();
   if (path.className.empty()) return read();
   ++load_.reads;
-  broker::Instance instance;
-  const broker::Status status = load_.broker.getInstance(path, broker::Selection(), instance);
-  checkStatus(status, "GetInstance of " + path.className, {kNotFound});
-  if (status.ok()) instances()(instance);
+  const auto instance = load_.broker.getInstance(path, broker::Selection());
+  checkStatus(instance ? broker::Status() : instance.error(), "GetInstance of " + path.className, {kNotFound});
+  if (instance) instances()(*instance);
 }
 
 void Client::traverse() {
@@ -196,11 +195,10 @@ void Client::invoke() {
       {"SetDNSSuffixSearchOrder", {"DNSDomainSuffixSearchOrder", broker::Value::textArray({writtenName()})}},
   };
   const Method& method = methods[chance(std::size(methods))];
-  broker::MethodResult result;
-  const broker::Status status =
-      load_.broker.invokeMethod(all[chance(all.size())], method.name, {method.argument}, result);
-  checkStatus(status, method.name, {});
-  const auto* value = std::get_if<std::uint64_t>(&result.returnValue.scalar);
+  const auto result = load_.broker.invokeMethod(all[chance(all.size())], method.name, {method.argument});
+  checkStatus(result ? broker::Status() : result.error(), method.name, {});
+  if (!result) return;
+  const auto* value = std::get_if<std::uint64_t>(&result->returnValue.scalar);
   if (value == nullptr || *value > 1) complain(std::string(method.name) + " gives neither 0 nor 1");
 }
 
