@@ -122,7 +122,8 @@ class LocalFacts {
                          zorva::agent::PropertyNumber number, bool hasValue) const {
     if (hasFile(interface)) return SettingSource::File;
     if (number == kNoNumber || !hasValue) return SettingSource::None;
-    return node != nullptr && node->isOverlaid(number) ? SettingSource::Set : SettingSource::Host;
+    const zorva::agent::Property* property = node == nullptr ? nullptr : node->find(number);
+    return property != nullptr && property->overlaid ? SettingSource::Set : SettingSource::Host;
   }
 
  private:
