@@ -46,8 +46,8 @@ util::FileDescriptor openForChange(const std::string& directory, const char* nam
   return file;
 }
 
-// None if that file cannot be opened or made. Not for writing where it exists: closing such a file counts as a change of
-// the directory for those who watch it.
+// None if that file cannot be opened or made. Not for writing where it exists: closing such a file counts as a change
+// of the directory for those who watch it.
 util::FileDescriptor openForRead(const std::string& directory, const char* name) {
   util::FileDescriptor file(::open((directory + name).c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
   if (file || errno != ENOENT) return file;

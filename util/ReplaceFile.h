@@ -12,8 +12,9 @@
 namespace zorva::util {
 
 /// Replaces directory + name by a file with that text, with a synced temporary file beside it. One writer at a time:
-/// the caller holds a lock. The file is readable for all and belongs to the owner of the directory, or gets the owner and
-/// the rights of `like`, as far as possible. Throws std::runtime_error, with one line; the old file is then unchanged.
+/// the caller holds a lock. The file is readable for all and belongs to the owner of the directory, or gets the owner
+/// and the rights of `like`, as far as possible. Throws std::runtime_error, with one line; the old file is then
+/// unchanged.
 [[nodiscard]] std::string replaceFile(const std::string& directory, const std::string& name, const std::string& text,
                                       const struct stat* like = nullptr);
 
@@ -21,8 +22,8 @@ namespace zorva::util {
 /// may then be truncated.
 void overwriteFile(const std::string& path, const std::string& text);
 
-/// Gives a new file to the owner and the group of its directory, as far as this process may: what root puts into the data
-/// directory of a service must belong to that service.
+/// Gives a new file to the owner and the group of its directory, as far as this process may: what root puts into the
+/// data directory of a service must belong to that service.
 void giveToOwnerOfDirectory(const FileDescriptor& file, const std::string& path);
 
 /// Writes all of it. False, with errno, if that fails.

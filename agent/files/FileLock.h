@@ -37,7 +37,8 @@ class FileLock : util::NotCopied {
   util::FileDescriptor file_;
 };
 
-/// Opens a lock's file for reading and writing, or makes it with these rights; it belongs to the owner of the directory. If that fails, errno has the reason.
+/// Opens a lock's file for reading and writing, or makes it with these rights; it belongs to the owner of the
+/// directory. If that fails, errno has the reason.
 util::FileDescriptor openLockFile(const std::string& path, mode_t rights);
 
 }  // namespace zorva::agent

@@ -33,8 +33,8 @@ std::string overlayJson(const std::vector<OverlayRow>& rows);
 /// A number under that name.
 std::string countJson(const char* name, std::size_t count);
 
-/// The results of `apply` and `revert`, in order: "interface", "owner", "profile", "changes" with the "property" and its
-/// values "before" and "after", and, where there is one, the "problem" or the "note".
+/// The results of `apply` and `revert`, in order: "interface", "owner", "profile", "changes" with the "property" and
+/// its values "before" and "after", and, where there is one, the "problem" or the "note".
 std::string applyResultsJson(const std::vector<zorva::agent::ApplyResult>& results);
 
 /// "objects", each with "path" and, if it cannot be fetched, "problem"; "associations" with their class and the indices
