@@ -98,6 +98,21 @@ TEST_F(InstanceModification, OfTheSettingDataSaysWhatWasRefusedByItsNumberAndLea
   EXPECT_THAT(logger_.pairs().errors(), IsEmpty());
 }
 
+TEST_F(InstanceModification, OfTheSettingDataIsDoneIfTheBrokerFailsToReturnTheConfigurationsName) {
+  world_.file("eth0", "CONFIG_NAME=office\n");
+  EXPECT_EQ(0U, modifySetting(setting_.with("ConfigurationName", "home")));
+  const Calls calls = broker_.calls();
+  std::size_t last = 0;
+  for (std::size_t i = 0; i < calls.size(); ++i) {
+    if (calls[i].name == "getCharPtr") last = i + 1;
+  }
+  broker_.startOver();
+  broker_.failAt(last, Mode::RcAndNull);
+  EXPECT_EQ(0U, modifySetting(setting_.with("ConfigurationName", "other")));
+  EXPECT_TRUE(broker_.hasFailed());
+  EXPECT_EQ("CONFIG_NAME=home\n", world_.fileContent("eth0").value_or("no file")) << "the key is as it was";
+}
+
 TEST_F(InstanceModification, OfTheGeneralDataFailsIfNeitherPropertyIsThere) {
   EXPECT_EQ(1U, modifyGeneral(general_));
   EXPECT_EQ(1U, modifyGeneral(general_.with("DNSSuffixesToAppend", "no array")));
