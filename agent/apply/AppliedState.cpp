@@ -133,7 +133,7 @@ const SavedDns* AppliedMemory::find(const std::string& interface, const std::str
 }
 
 std::string appliedDirectory(const std::string& dataDir) {
-  const std::string path = dataDir + kDirectory;
+  std::string path = dataDir + kDirectory;
   if (::mkdir(path.c_str(), S_IRWXU | S_IRGRP | S_IXGRP | S_IROTH | S_IXOTH) != 0 && errno != EEXIST) {
     util::throwFileError(path, "cannot be made");
   }
