@@ -10,7 +10,6 @@
 #include "cli/commands/ViewJson.h"
 #include "cli/output/Console.h"
 #include "cli/output/Failure.h"
-#include "cli/output/ResultWriter.h"
 #include "cli/output/Text.h"
 #include "cli/session/Session.h"
 #include "cli/session/Trial.h"
@@ -181,8 +180,6 @@ void applyOnTrial(Session& session, const Globals& globals, const ApplyCommandOp
 }
 
 void apply(const Globals& globals, const ApplyCommandOptions& options) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "apply");
-  requireLocal(globals, "apply");
   requireSelection(options, kApplyWords, false);
   Session session(globals);
   if (options.automatic && !zorva::agent::currentConfig().appliesToHost) return;
@@ -194,8 +191,6 @@ void apply(const Globals& globals, const ApplyCommandOptions& options) {
 }
 
 void revert(const Globals& globals, const ApplyCommandOptions& options) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "revert");
-  requireLocal(globals, "revert");
   requireSelection(options, kRevertWords, true);
   Session session(globals);
   const std::vector<ApplyResult> results = whileSettingsStay(session, [&] {
@@ -206,8 +201,6 @@ void revert(const Globals& globals, const ApplyCommandOptions& options) {
 }
 
 void confirm(const Globals& globals) {
-  requireFormat(globals.output, {OutputFormat::Table}, "confirm");
-  requireLocal(globals, "confirm");
   const Session session(globals);
   asFailure([] {
     if (!zorva::agent::pendingTrial()) {
@@ -224,13 +217,14 @@ void confirm(const Globals& globals) {
 void addApplyCommands(CommandLine& line) {
   const auto options = std::make_shared<ApplyCommandOptions>();
   line.add("apply", "Bring the stored settings to the host, through the owner of each interface")
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .writesJson()
+      .local()
       .examples(
           "  zorvactl apply --dry-run                      what would change\n"
           "  zorvactl apply eth0\n"
           "  zorvactl apply --confirm 60                   taken back unless confirmed in a minute")
       .flag("--all", "Of all interfaces that have any, as without a name", options->all)
-      .flag("--dry-run", "Show what would be done, and do nothing", options->dryRun)
+      .dryRun(options->dryRun)
       .flag("--automatic",
             "As the service does: nothing unless the configuration says apply = \"host\", and not what was "
             "taken back",
@@ -239,14 +233,17 @@ void addApplyCommands(CommandLine& line) {
       .words("INTERFACE", "Of these interfaces", Many::Any, options->interfaces)
       .runs<ApplyCommandOptions>(apply, options);
   line.add("confirm", "Keep the settings that 'apply --confirm' has on trial")
+      .writes({OutputFormat::Table})
+      .local()
       .examples("  zorvactl confirm")
       .runs(confirm);
   const auto reverting = std::make_shared<ApplyCommandOptions>();
   line.add("revert", "Give the host back what it had before the first apply")
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .writesJson()
+      .local()
       .examples("  zorvactl revert eth0\n  zorvactl revert --all --dry-run")
       .flag("--all", "Of all interfaces that were ever changed", reverting->all)
-      .flag("--dry-run", "Show what would be done, and do nothing", reverting->dryRun)
+      .dryRun(reverting->dryRun)
       .words("INTERFACE", "Of these interfaces", Many::Any, reverting->interfaces)
       .runs<ApplyCommandOptions>(revert, reverting);
   line.add("guard-trial", "Take the settings on trial back when standard input ends").hidden().runs(guardTrial);

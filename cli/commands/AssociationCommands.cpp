@@ -103,32 +103,36 @@ auto into(ResultWriter& writer) {
   };
 }
 
-void showAssociators(const Globals& globals, const AssociationOptions& options) {
-  follow(globals, options, Results::Instances, "associators", options.resultClass,
-         [](auto& cim, const auto& path, const auto& filter, const auto& selection, ResultWriter& writer) {
-           return cim.associators(path, filter, selection, into<broker::Instance>(writer));
+void followToInstances(const Globals& globals, const AssociationOptions& options, const char* what,
+                       const std::string& top, decltype(&Operations::associators) operation) {
+  follow(globals, options, Results::Instances, what, top,
+         [operation](auto& cim, const auto& path, const auto& filter, const auto& selection, ResultWriter& writer) {
+           return (cim.*operation)(path, filter, selection, into<broker::Instance>(writer));
          });
+}
+
+void followToNames(const Globals& globals, const AssociationOptions& options, const char* what,
+                   decltype(&Operations::associatorNames) operation) {
+  follow(globals, options, Results::Names, what, {},
+         [operation](auto& cim, const auto& path, const auto& filter, const auto&, ResultWriter& writer) {
+           return (cim.*operation)(path, filter, into<broker::ObjectPath>(writer));
+         });
+}
+
+void showAssociators(const Globals& globals, const AssociationOptions& options) {
+  followToInstances(globals, options, "associators", options.resultClass, &Operations::associators);
 }
 
 void showAssociatorNames(const Globals& globals, const AssociationOptions& options) {
-  follow(globals, options, Results::Names, "associator names", {},
-         [](auto& cim, const auto& path, const auto& filter, const auto&, ResultWriter& writer) {
-           return cim.associatorNames(path, filter, into<broker::ObjectPath>(writer));
-         });
+  followToNames(globals, options, "associator names", &Operations::associatorNames);
 }
 
 void showReferences(const Globals& globals, const AssociationOptions& options) {
-  follow(globals, options, Results::Instances, "references", options.associationClass,
-         [](auto& cim, const auto& path, const auto& filter, const auto& selection, ResultWriter& writer) {
-           return cim.references(path, filter, selection, into<broker::Instance>(writer));
-         });
+  followToInstances(globals, options, "references", options.associationClass, &Operations::references);
 }
 
 void showReferenceNames(const Globals& globals, const AssociationOptions& options) {
-  follow(globals, options, Results::Names, "reference names", {},
-         [](auto& cim, const auto& path, const auto& filter, const auto&, ResultWriter& writer) {
-           return cim.referenceNames(path, filter, into<broker::ObjectPath>(writer));
-         });
+  followToNames(globals, options, "reference names", &Operations::referenceNames);
 }
 
 void addFarEnd(Subcommand& subcommand, AssociationOptions& options) {
@@ -155,14 +159,11 @@ Subcommand addOne(CommandLine& line, const Naming& naming, Results results,
   const auto options = std::make_shared<AssociationOptions>();
   Subcommand subcommand = line.add(naming.name, naming.description);
   subcommand.alias(naming.alias)
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .readsNames()
       .word("PATH", "The object path at the near end", options->path)
       .option("--role", "ROLE", "Only where the near end is this reference", options->role);
   addFilter(subcommand, *options);
-  if (results == Results::Instances) {
-    subcommand.writes({OutputFormat::Table, OutputFormat::Json, OutputFormat::Mof, OutputFormat::Xml})
-        .repeatable("--property", "PROPERTY", "Only this property; may be repeated", options->properties);
-  }
+  if (results == Results::Instances) subcommand.readsInstances(options->properties);
   subcommand.runs<AssociationOptions>(command, options);
   return subcommand;
 }

@@ -6,7 +6,6 @@
 #include "cli/output/Console.h"
 #include "cli/output/Failure.h"
 #include "cli/output/JsonOutput.h"
-#include "cli/output/ResultWriter.h"
 #include "cli/output/Text.h"
 #include "cli/output/ValueText.h"
 #include "cli/session/Assignments.h"
@@ -88,7 +87,6 @@ std::string methodTable(const broker::MethodResult& result, const Layout& layout
 }
 
 void modifyInstance(const Globals& globals, const ModifyOptions& options) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "modify");
   Session session(globals);
   const std::vector<Assignment> assignments = parseAssignments(options.values);
   const broker::ObjectPath path = resolvePath(session, options.path);
@@ -108,7 +106,6 @@ void modifyInstance(const Globals& globals, const ModifyOptions& options) {
 }
 
 void invokeMethod(const Globals& globals, const InvokeOptions& options) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "invoke");
   Session session(globals);
   const std::vector<Assignment> assignments = parseAssignments(options.values);
   const broker::ObjectPath path = resolvePath(session, options.path);
@@ -139,7 +136,7 @@ void addModifyCommand(CommandLine& line) {
   const auto options = std::make_shared<ModifyOptions>();
   line.add("modify", "Change properties of an instance")
       .alias("mi")
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .writesJson()
       .examples(
           "  zorvactl modify 'ZORVA_DNSSettingData.InstanceID=\"Computer%eth0\"' DomainName=lab.example.org\n"
           "  zorvactl modify 'ZORVA_DNSSettingData.InstanceID=\"Computer%eth0\"' \\\n"
@@ -157,7 +154,7 @@ void addInvokeCommand(CommandLine& line) {
   const auto options = std::make_shared<InvokeOptions>();
   line.add("invoke", "Call a method of an instance")
       .alias("cm")
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .writesJson()
       .examples("  zorvactl invoke 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' SetDNSDomain DNSDomain=x.example.org")
       .word("PATH", "Its object path", options->path)
       .word("METHOD", "The method", options->method)

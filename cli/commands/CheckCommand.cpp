@@ -5,7 +5,6 @@
 #include "cli/commands/Commands.h"
 #include "cli/commands/ViewJson.h"
 #include "cli/output/Console.h"
-#include "cli/output/ResultWriter.h"
 #include "cli/output/Text.h"
 #include "cli/session/HostView.h"
 #include "cli/session/ServerCheck.h"
@@ -75,7 +74,6 @@ CheckResult resultOf(Session& session, const CheckOptions& options) {
 }
 
 void checkHost(const Globals& globals, const CheckOptions& options) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "check");
   if (!globals.url.empty()) {
     throw Failure(ExitCode::WrongUsage,
                   "zorvactl check asks the DNS servers from this host, and not from that of a URL",
@@ -100,7 +98,7 @@ void checkHost(const Globals& globals, const CheckOptions& options) {
 void addCheckCommand(CommandLine& line) {
   const auto options = std::make_shared<CheckOptions>();
   line.add("check", "Ask each DNS server, and look for settings that nothing uses")
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .writesJson()
       .examples(
           "  zorvactl check\n"
           "  zorvactl check eth0                           the servers of one interface\n"

@@ -3,7 +3,6 @@
 #include "cli/commands/Commands.h"
 #include "cli/commands/ViewJson.h"
 #include "cli/output/Console.h"
-#include "cli/output/ResultWriter.h"
 #include "cli/session/ClassRows.h"
 #include "cli/session/Session.h"
 
@@ -39,7 +38,6 @@ std::vector<ClassRow> classesOf(Session& session, bool countsAll) {
 }
 
 void listClasses(const Globals& globals, const CountOptions& options) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "classes");
   Session session(globals);
   const std::vector<ClassRow> rows = classesOf(session, options.all);
   tellUncounted(rows);
@@ -56,7 +54,7 @@ void listClasses(const Globals& globals, const CountOptions& options) {
 void addClassesCommand(CommandLine& line) {
   const auto options = std::make_shared<CountOptions>();
   line.add("classes", "The classes with their providers and instance counts")
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .writesJson()
       .examples("  zorvactl classes")
       .flag("--all", "Count the associations of a host with very many interfaces, too; takes long", options->all)
       .runs<CountOptions>(listClasses, options);

@@ -6,8 +6,10 @@
 #include <algorithm>
 #include <charconv>
 #include <map>
+#include <set>
 
 #include "cli/output/Console.h"
+#include "cli/output/Failure.h"
 #include "cli/output/Text.h"
 
 namespace zorva::cli {
@@ -33,15 +35,20 @@ failed, 2 wrong usage or configuration. "zorvactl SUBCOMMAND --help" tells more.
 struct CommandLine::Registered {
   CLI::App app{"The DNS client configuration of this host as CIM objects; no server is needed.", "zorvactl"};
   Globals globals;
-  Command command;
+  const CLI::App* chosen = nullptr;  ///< the subcommand that was read
+  Command command;                   ///< of that
   std::map<const CLI::App*, std::string> examples;
   std::map<const CLI::App*, std::vector<OutputFormat>> formats;
+  std::set<const CLI::App*> formatsToRequire;
+  std::set<const CLI::App*> local;
   std::map<const CLI::Option*, std::string> kinds;  ///< if the name of the option does not say it
   std::map<const CLI::Option*, std::vector<std::string>> choices;
 
   /// The formats that a subcommand, or one under it, can write.
   std::vector<OutputFormat> formatsOf(const CLI::App& subcommand) const;
   std::string footerOf(const CLI::App& subcommand) const;
+  /// Throws Failure unless the command can write the format and be run here.
+  void requireRunnable() const;
   /// Those of all subcommands.
   void placeFooters(CLI::App& above) const;
   /// The kind of a word at its position: a subcommand, an option, or the positional with that number.
@@ -195,6 +202,19 @@ std::string CommandLine::Registered::footerOf(const CLI::App& subcommand) const 
          "--quiet.";
 }
 
+void CommandLine::Registered::requireRunnable() const {
+  const std::string call = "zorvactl " + callOf(*chosen);
+  const std::vector<OutputFormat> allowed = formatsOf(*chosen);
+  if (formatsToRequire.contains(chosen) && std::find(allowed.begin(), allowed.end(), globals.output) == allowed.end()) {
+    throw Failure(ExitCode::WrongUsage, call + " has no output as " + formatName(globals.output),
+                  "it writes " + joined(namesOf(allowed), ", "));
+  }
+  if (local.contains(chosen) && !globals.url.empty()) {
+    throw Failure(ExitCode::WrongUsage, call + " is about files of this host, which no CIM server hands out",
+                  "leave out --url, and run it on the host that is meant");
+  }
+}
+
 void CommandLine::Registered::placeFooters(CLI::App& above) const {
   for (CLI::App* each : above.get_subcommands([](CLI::App*) { return true; })) {
     each->footer(footerOf(*each));
@@ -242,7 +262,22 @@ Subcommand& Subcommand::examples(std::string_view lines) {
 }
 
 Subcommand& Subcommand::writes(std::vector<OutputFormat> formats) {
+  line_.registered_->formatsToRequire.insert(&app_);
+  return offers(std::move(formats));
+}
+
+Subcommand& Subcommand::offers(std::vector<OutputFormat> formats) {
   line_.registered_->formats[&app_] = std::move(formats);
+  return *this;
+}
+
+Subcommand& Subcommand::readsInstances(std::vector<std::string>& properties) {
+  return offers({OutputFormat::Table, OutputFormat::Json, OutputFormat::Mof, OutputFormat::Xml})
+      .repeatable("--property", "PROPERTY", "Only this property; may be repeated", properties);
+}
+
+Subcommand& Subcommand::local() {
+  line_.registered_->local.insert(&app_);
   return *this;
 }
 
@@ -296,7 +331,10 @@ Subcommand& Subcommand::flag(const std::string& name, const std::string& descrip
 }
 
 Subcommand& Subcommand::runs(Command command) {
-  app_.callback([&to = line_.registered_->command, command = std::move(command)] { to = command; });
+  app_.callback([&read = *line_.registered_, &app = app_, command = std::move(command)] {
+    read.chosen = &app;
+    read.command = command;
+  });
   return *this;
 }
 
@@ -319,6 +357,7 @@ const Globals& CommandLine::globals() const noexcept { return registered_->globa
 
 void CommandLine::run() const {
   if (registered_->globals.quiet) writeOnlyErrors();
+  registered_->requireRunnable();
   registered_->command(registered_->globals);
 }
 

@@ -58,11 +58,24 @@ class Subcommand {
   /// How it is called, a line each, for its help.
   Subcommand& examples(std::string_view lines);
 
-  /// The formats that its help and completion list; without this, and for one format, help lists none.
+  /// The formats that its help and completion list; without this, and for one format, help lists none. The command
+  /// does not run with another.
   Subcommand& writes(std::vector<OutputFormat> formats);
+  Subcommand& writesJson() { return writes({OutputFormat::Table, OutputFormat::Json}); }
+
+  /// The same for a command that refuses other formats itself.
+  Subcommand& offers(std::vector<OutputFormat> formats);
+
+  /// It has instances as results, in the formats of those and on demand with some properties alone; or names.
+  Subcommand& readsInstances(std::vector<std::string>& properties);
+  Subcommand& readsNames() { return offers({OutputFormat::Table, OutputFormat::Json}); }
+
+  /// It reads or writes files of this host: the command does not run with a server.
+  Subcommand& local();
 
   /// A required positional word: "PATH". Its name says how it is completed.
   Subcommand& word(const std::string& name, const std::string& description, std::string& into);
+  Subcommand& interface(std::string& into) { return word("INTERFACE", "The interface's name", into); }
   Subcommand& optionalWord(const std::string& name, const std::string& description, std::string& into);
 
   /// The words at the last place. `kind` says what completes them, where `name` does not.
@@ -81,6 +94,7 @@ class Subcommand {
                          std::vector<std::string>& into);
 
   Subcommand& flag(const std::string& name, const std::string& description, bool& into);
+  Subcommand& dryRun(bool& into) { return flag("--dry-run", "Show what would be done, and do nothing", into); }
 
   /// The command of this subcommand.
   Subcommand& runs(Command command);
@@ -112,7 +126,8 @@ class CommandLine : util::NotCopied {
 
   const Globals& globals() const noexcept;
 
-  /// Runs the command that was read. Throws what that throws.
+  /// Runs the command that was read. Throws what that throws, and Failure (wrong usage) if it does not write the format
+  /// that is asked for, or cannot use the server that is given.
   void run() const;
 
   /// The possible words after these words.

@@ -154,7 +154,7 @@ void addCompletionCommands(CommandLine& line) {
   const auto words = std::make_shared<std::vector<std::string>>();
   line.add("complete", "")
       .hidden()
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .offers({OutputFormat::Table, OutputFormat::Json})
       .words("WORD", "", Many::Any, *words)
       .runs([&line, words](const Globals& globals) { completeWords(line, globals, *words); });
 }

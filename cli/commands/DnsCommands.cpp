@@ -59,15 +59,14 @@ bool sameServer(const std::string& a, const std::string& b) {
   return a == b || (address.family != AF_UNSPEC && address == addressOf(b));
 }
 
-constexpr ListSetting kServers{"dns", "DNSServerAddresses", "server",  "SERVER", "An IP address",
-                               true,  requireServer,        sameServer};
+constexpr ListSetting kServers{"DNSServerAddresses", "server",  "SERVER", "An IP address", true,
+                               requireServer,        sameServer};
 
 }  // namespace
 
 void addDnsCommands(CommandLine& line) {
   Subcommand dns = line.add("dns", "The DNS servers of an interface");
-  dns.writes({OutputFormat::Table, OutputFormat::Json})
-      .examples("  zorvactl dns set eth0 192.0.2.53 2001:db8::53\n  zorvactl dns add eth0 192.0.2.54");
+  dns.writesJson().examples("  zorvactl dns set eth0 192.0.2.53 2001:db8::53\n  zorvactl dns add eth0 192.0.2.54");
   addShow(dns, kServers).examples("  zorvactl dns show eth0");
   addChange(dns, kServers, "set", "Replace them; none at all empties the list", Many::Any, setList)
       .examples(

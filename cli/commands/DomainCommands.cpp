@@ -4,7 +4,6 @@
 
 #include "cli/commands/Commands.h"
 #include "cli/commands/SettingList.h"
-#include "cli/output/ResultWriter.h"
 #include "cli/session/Assignments.h"
 #include "util/Names.h"
 
@@ -28,11 +27,10 @@ bool sameSuffix(const std::string& a, const std::string& b) {
   return util::sameName(plain(a), plain(b));
 }
 
-constexpr ListSetting kSuffixes{"suffixes", "DNSSuffixesToAppend", "suffix",  "SUFFIX", "A domain's name",
-                                false,      requireSuffix,         sameSuffix};
+constexpr ListSetting kSuffixes{"DNSSuffixesToAppend", "suffix",  "SUFFIX", "A domain's name", false,
+                                requireSuffix,         sameSuffix};
 
 void setDomain(const Globals& globals, const SettingOptions& options) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "domain");
   const std::string& name = options.values.front();
   requirePlainText("NAME", name);
   if (!isName(name)) throw refused(name, std::string("is no domain name: it has ") + kNameRule);
@@ -47,18 +45,18 @@ void setDomain(const Globals& globals, const SettingOptions& options) {
 void addDomainCommand(CommandLine& line) {
   const auto options = std::make_shared<SettingOptions>();
   line.add("domain", "Set the DNS domain of an interface")
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .writesJson()
       .examples("  zorvactl domain eth0 lab.example.org\n  zorvactl domain eth0 ''")
-      .word("INTERFACE", "The interface's name", options->interface)
-      .flag("--dry-run", "Show what would be done, and do nothing", options->dryRun)
+      .interface(options->interface)
+      .dryRun(options->dryRun)
       .words("NAME", "The domain's name; '' empties it", Many::One, options->values)
       .runs<SettingOptions>(setDomain, options);
 }
 
 void addSuffixesCommands(CommandLine& line) {
   Subcommand suffixes = line.add("suffixes", "The DNS suffixes of the host");
-  suffixes.writes({OutputFormat::Table, OutputFormat::Json})
-      .examples("  zorvactl suffixes set example.org example.net\n  zorvactl suffixes add lab.example.org");
+  suffixes.writesJson().examples(
+      "  zorvactl suffixes set example.org example.net\n  zorvactl suffixes add lab.example.org");
   addShow(suffixes, kSuffixes).examples("  zorvactl suffixes show");
   addChange(suffixes, kSuffixes, "set", "Replace them; none at all empties the list", Many::Any, setList)
       .examples("  zorvactl suffixes set example.org example.net");

@@ -14,7 +14,6 @@
 #include "cli/commands/ViewJson.h"
 #include "cli/output/Console.h"
 #include "cli/output/Failure.h"
-#include "cli/output/ResultWriter.h"
 #include "cli/session/Paths.h"
 #include "cli/session/Session.h"
 #include "util/FileDescriptor.h"
@@ -81,8 +80,6 @@ Graph graphOf(Session& session, const GraphOptions& options) {
 }
 
 void showGraph(const Globals& globals, const GraphOptions& options) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json, OutputFormat::Dot, OutputFormat::Svg},
-                "graph");
   Session session(globals);
   const Session::Quiet quiet(session);
   const Graph graph = graphOf(session, options);

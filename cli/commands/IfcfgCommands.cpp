@@ -13,7 +13,6 @@
 #include "cli/commands/ViewJson.h"
 #include "cli/output/Console.h"
 #include "cli/output/Failure.h"
-#include "cli/output/ResultWriter.h"
 #include "cli/output/Text.h"
 #include "cli/session/Change.h"
 #include "cli/session/HostView.h"
@@ -51,8 +50,6 @@ void makeDefaultDirectory() {
 }
 
 void initInterfaceFile(const Globals& globals, const InitOptions& options) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "ifcfg init");
-  requireLocal(globals, "ifcfg init");
   Session session(globals);
   const auto tree = session.tree();
   const SettingFile file(options.interface);
@@ -70,8 +67,6 @@ void initInterfaceFile(const Globals& globals, const InitOptions& options) {
 }
 
 void showInterfaceFile(const Globals& globals, const std::string& interface) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "ifcfg show");
-  requireLocal(globals, "ifcfg show");
   const Session session(globals);
   const SettingFile file(interface);
   const std::vector<SettingLine> lines = file.read();
@@ -114,8 +109,6 @@ std::vector<ListedFile> listedFiles(const Session& session) {
 }
 
 void listInterfaceFiles(const Globals& globals) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "ifcfg list");
-  requireLocal(globals, "ifcfg list");
   const Session session(globals);
   const std::vector<ListedFile> files = listedFiles(session);
   if (globals.output == OutputFormat::Json) {
@@ -141,8 +134,6 @@ struct RemoveOptions {
 };
 
 void removeInterfaceFile(const Globals& globals, const RemoveOptions& options) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "ifcfg remove");
-  requireLocal(globals, "ifcfg remove");
   Session session(globals);
   const SettingFile file(options.interface);
   const std::vector<SettingLine> lines = file.read();
@@ -178,8 +169,6 @@ void requireOrphan(const zorva::agent::TreeSnapshot& tree, const std::string& in
 }
 
 void adoptInterfaceFile(const Globals& globals, const AdoptOptions& options) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "ifcfg adopt");
-  requireLocal(globals, "ifcfg adopt");
   Session session(globals);
   const Session::Changing alone(session, options.dryRun);
   const auto tree = session.tree();
@@ -210,25 +199,28 @@ void adoptInterfaceFile(const Globals& globals, const AdoptOptions& options) {
 /// About the files of all interfaces, also of those that are gone.
 void addFileCommands(Subcommand& ifcfg) {
   ifcfg.add("list", "List the files that there are, and mark those whose interfaces are gone")
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .writesJson()
+      .local()
       .examples("  zorvactl ifcfg list")
       .runs(listInterfaceFiles);
 
   const auto removed = std::make_shared<RemoveOptions>();
   ifcfg.add("remove", "Remove it; the interface then has what the host says")
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .writesJson()
+      .local()
       .examples("  zorvactl ifcfg remove eth0 --dry-run\n  zorvactl ifcfg remove eth0")
-      .word("INTERFACE", "The interface's name", removed->interface)
-      .flag("--dry-run", "Show what would be done, and do nothing", removed->dryRun)
+      .interface(removed->interface)
+      .dryRun(removed->dryRun)
       .runs<RemoveOptions>(removeInterfaceFile, removed);
 
   const auto adopted = std::make_shared<AdoptOptions>();
   ifcfg.add("adopt", "Give the file of an interface that is gone to another one")
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .writesJson()
+      .local()
       .examples("  zorvactl ifcfg adopt eth0 enp1s0             eth0 is called enp1s0 now")
       .word("OLD", "The name of the interface that is gone", adopted->from)
       .word("INTERFACE", "The interface that gets its file", adopted->to)
-      .flag("--dry-run", "Show what would be done, and do nothing", adopted->dryRun)
+      .dryRun(adopted->dryRun)
       .runs<AdoptOptions>(adoptInterfaceFile, adopted);
 }
 
@@ -236,25 +228,26 @@ void addFileCommands(Subcommand& ifcfg) {
 
 void addIfcfgCommands(CommandLine& line) {
   Subcommand ifcfg = line.add("ifcfg", "The file of an interface's settings");
-  ifcfg.writes({OutputFormat::Table, OutputFormat::Json})
-      .examples("  zorvactl ifcfg init eth0\n  zorvactl ifcfg show eth0");
+  ifcfg.writesJson().examples("  zorvactl ifcfg init eth0\n  zorvactl ifcfg show eth0");
 
   const auto options = std::make_shared<InitOptions>();
   ifcfg.add("init", "Write it, with what the host says now")
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .writesJson()
+      .local()
       .examples(
           "  zorvactl ifcfg init eth0 --dry-run            what it would write\n"
           "  zorvactl ifcfg init eth0 --force              puts a new file in the old one's place")
-      .word("INTERFACE", "The interface's name", options->interface)
-      .flag("--dry-run", "Show what would be done, and do nothing", options->dryRun)
+      .interface(options->interface)
+      .dryRun(options->dryRun)
       .flag("--force", "Replace a file that is there", options->force)
       .runs<InitOptions>(initInterfaceFile, options);
 
   const auto interface = std::make_shared<std::string>();
   ifcfg.add("show", "Show it")
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .writesJson()
+      .local()
       .examples("  zorvactl ifcfg show eth0")
-      .word("INTERFACE", "The interface's name", *interface)
+      .interface(*interface)
       .runs<std::string>(showInterfaceFile, interface);
   addFileCommands(ifcfg);
 }

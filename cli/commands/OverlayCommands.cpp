@@ -8,7 +8,6 @@
 #include "cli/commands/ViewJson.h"
 #include "cli/output/Console.h"
 #include "cli/output/Failure.h"
-#include "cli/output/ResultWriter.h"
 #include "cli/output/Text.h"
 #include "cli/output/TreeText.h"
 #include "cli/session/Session.h"
@@ -18,8 +17,6 @@ namespace zorva::cli {
 namespace {
 
 void showOverlay(const Globals& globals) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "overlay show");
-  requireLocal(globals, "overlay show");
   const Session session(globals);
   const std::vector<zorva::agent::OverlayEntry> entries = asFailure([] { return zorva::agent::overlayEntries(); });
   std::vector<OverlayRow> rows;
@@ -41,8 +38,6 @@ void showOverlay(const Globals& globals) {
 }
 
 void clearOverlay(const Globals& globals, const std::string& name) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "overlay clear");
-  requireLocal(globals, "overlay clear");
   const Session session(globals);
   const auto interface = name.empty() ? std::nullopt : std::optional(name);
   const std::size_t cleared = asFailure([&interface] { return zorva::agent::clearOverlay(interface); });
@@ -58,17 +53,14 @@ void clearOverlay(const Globals& globals, const std::string& name) {
 
 void addOverlayCommands(CommandLine& line) {
   Subcommand overlay = line.add("overlay", "Values that were set and replace the host's own");
-  overlay.writes({OutputFormat::Table, OutputFormat::Json})
-      .examples("  zorvactl overlay show\n  zorvactl overlay clear eth0");
+  overlay.writesJson().examples("  zorvactl overlay show\n  zorvactl overlay clear eth0");
 
-  overlay.add("show", "Show them")
-      .writes({OutputFormat::Table, OutputFormat::Json})
-      .examples("  zorvactl overlay show")
-      .runs(showOverlay);
+  overlay.add("show", "Show them").writesJson().local().examples("  zorvactl overlay show").runs(showOverlay);
 
   const auto interface = std::make_shared<std::string>();
   overlay.add("clear", "Take them back")
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .writesJson()
+      .local()
       .examples(
           "  zorvactl overlay clear eth0\n"
           "  zorvactl overlay clear                        of all interfaces")

@@ -57,40 +57,36 @@ void getInstance(const Globals& globals, const ReadOptions& options) {
   writer->finish();
 }
 
+/// Completes the registration of one of the three.
+Subcommand addRead(Subcommand subcommand, Results results, const char* word, const char* meaning,
+                   void (*command)(const Globals& globals, const ReadOptions& options)) {
+  const auto options = std::make_shared<ReadOptions>();
+  if (results == Results::Instances) {
+    subcommand.readsInstances(options->properties);
+  } else {
+    subcommand.readsNames();
+  }
+  subcommand.word(word, meaning, options->target).runs<ReadOptions>(command, options);
+  return subcommand;
+}
+
 }  // namespace
 
 void addReadCommands(CommandLine& line) {
-  auto options = std::make_shared<ReadOptions>();
-  line.add("enumerate", "All instances of a class")
-      .alias("ei")
-      .writes({OutputFormat::Table, OutputFormat::Json, OutputFormat::Mof, OutputFormat::Xml})
+  addRead(line.add("enumerate", "All instances of a class").alias("ei"), Results::Instances, "CLASS",
+          "The class, or one above it", enumerateInstances)
       .examples(
           "  zorvactl ei ZORVA_DNSProtocolEndPoint\n"
           "  zorvactl ei ZORVA_DNSSettingData --property DomainName --property DNSServerAddresses --output json\n"
-          "  zorvactl ei CIM_SettingData                   and of all classes below it")
-      .word("CLASS", "The class, or one above it", options->target)
-      .repeatable("--property", "PROPERTY", "Only this property; may be repeated", options->properties)
-      .runs<ReadOptions>(enumerateInstances, options);
-
-  options = std::make_shared<ReadOptions>();
-  line.add("names", "The names of all instances of a class")
-      .alias("ein")
-      .writes({OutputFormat::Table, OutputFormat::Json})
-      .examples("  zorvactl ein ZORVA_DNSSettingData")
-      .word("CLASS", "The class, or one above it", options->target)
-      .runs<ReadOptions>(enumerateNames, options);
-
-  options = std::make_shared<ReadOptions>();
-  line.add("get", "One instance")
-      .alias("gi")
-      .writes({OutputFormat::Table, OutputFormat::Json, OutputFormat::Mof, OutputFormat::Xml})
+          "  zorvactl ei CIM_SettingData                   and of all classes below it");
+  addRead(line.add("names", "The names of all instances of a class").alias("ein"), Results::Names, "CLASS",
+          "The class, or one above it", enumerateNames)
+      .examples("  zorvactl ein ZORVA_DNSSettingData");
+  addRead(line.add("get", "One instance").alias("gi"), Results::Instances, "PATH", "Its object path", getInstance)
       .examples(
           "  zorvactl gi 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"'\n"
           "  zorvactl gi 'ZORVA_DNSSettingData.InstanceID=\"Computer%eth0\"' --output mof\n"
-          "  zorvactl gi ZORVA_DNSGeneralSettingData       the only one needs no keys")
-      .word("PATH", "Its object path", options->target)
-      .repeatable("--property", "PROPERTY", "Only this property; may be repeated", options->properties)
-      .runs<ReadOptions>(getInstance, options);
+          "  zorvactl gi ZORVA_DNSGeneralSettingData       the only one needs no keys");
 }
 
 }  // namespace zorva::cli

@@ -4,7 +4,6 @@
 
 #include "cli/output/Console.h"
 #include "cli/output/JsonOutput.h"
-#include "cli/output/ResultWriter.h"
 #include "cli/output/Text.h"
 #include "cli/output/ValueText.h"
 #include "cli/session/Change.h"
@@ -65,11 +64,6 @@ std::vector<std::string> with(std::vector<std::string> texts, const std::vector<
   return texts;
 }
 
-void requireReadable(const ListSetting& setting, const char* subcommand, const Globals& globals) {
-  const std::string call = std::string(setting.command) + " " + subcommand;
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, call.c_str());
-}
-
 broker::Instance settingOf(Session& session, const ListSetting& setting, const SettingOptions& options) {
   return setting.isOfInterface ? settingOfInterface(session, options.interface) : settingOfHost(session);
 }
@@ -97,7 +91,6 @@ void changeList(const ListSetting& setting, const Globals& globals, const Settin
 }  // namespace
 
 void showList(const ListSetting& setting, const Globals& globals, const SettingOptions& options) {
-  requireReadable(setting, "show", globals);
   Session session(globals);
   warnOfOrphans(session);
   const std::vector<std::string> texts = listOf(settingOf(session, setting, options), setting.property);
@@ -113,20 +106,17 @@ void showList(const ListSetting& setting, const Globals& globals, const SettingO
 }
 
 void setList(const ListSetting& setting, const Globals& globals, const SettingOptions& options) {
-  requireReadable(setting, "set", globals);
   requireEach(options.values, setting.require, setting.same);
   changeList(setting, globals, options, [&](const std::vector<std::string>& /*texts*/) { return options.values; });
 }
 
 void addToList(const ListSetting& setting, const Globals& globals, const SettingOptions& options) {
-  requireReadable(setting, "add", globals);
   requireEach(options.values, setting.require, setting.same);
   changeList(setting, globals, options,
              [&](const std::vector<std::string>& texts) { return with(texts, options.values, setting.same); });
 }
 
 void removeFromList(const ListSetting& setting, const Globals& globals, const SettingOptions& options) {
-  requireReadable(setting, "remove", globals);
   changeList(setting, globals, options,
              [&](const std::vector<std::string>& texts) { return without(texts, options.values, setting.element); });
 }
@@ -134,8 +124,8 @@ void removeFromList(const ListSetting& setting, const Globals& globals, const Se
 Subcommand addShow(Subcommand& parent, const ListSetting& setting) {
   const auto options = std::make_shared<SettingOptions>();
   Subcommand subcommand = parent.add("show", "Show them");
-  subcommand.writes({OutputFormat::Table, OutputFormat::Json});
-  if (setting.isOfInterface) subcommand.word("INTERFACE", "The interface's name", options->interface);
+  subcommand.writesJson();
+  if (setting.isOfInterface) subcommand.interface(options->interface);
   subcommand.runs([&setting, options](const Globals& globals) { showList(setting, globals, *options); });
   return subcommand;
 }
@@ -144,9 +134,9 @@ Subcommand addChange(Subcommand& parent, const ListSetting& setting, const char*
                      Many many, ListCommand command) {
   const auto options = std::make_shared<SettingOptions>();
   Subcommand subcommand = parent.add(name, description);
-  subcommand.writes({OutputFormat::Table, OutputFormat::Json});
-  if (setting.isOfInterface) subcommand.word("INTERFACE", "The interface's name", options->interface);
-  subcommand.flag("--dry-run", "Show what would be done, and do nothing", options->dryRun)
+  subcommand.writesJson();
+  if (setting.isOfInterface) subcommand.interface(options->interface);
+  subcommand.dryRun(options->dryRun)
       .words(setting.word, setting.meaning, many, options->values)
       .runs([&setting, command, options](const Globals& globals) { command(setting, globals, *options); });
   return subcommand;

@@ -23,7 +23,6 @@ struct SettingOptions {
 
 /// A property that is a list, and how a person names and changes it.
 struct ListSetting {
-  const char* command;                                       ///< "dns": the subcommand above those of the list
   const char* property;                                      ///< its name in the schema
   const char* element;                                       ///< "server"
   const char* word;                                          ///< "SERVER": an element in the help

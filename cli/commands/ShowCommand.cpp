@@ -7,7 +7,6 @@
 #include "cli/commands/Commands.h"
 #include "cli/commands/ViewJson.h"
 #include "cli/output/Console.h"
-#include "cli/output/ResultWriter.h"
 #include "cli/output/Text.h"
 #include "cli/session/HostView.h"
 #include "cli/session/Session.h"
@@ -169,7 +168,6 @@ void writeView(const HostView& view, const ShowOptions& options, const Layout& l
 }
 
 void showHost(const Globals& globals, const ShowOptions& options) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "show");
   Session session(globals);
   HostView view = viewOf(session);
   if (!options.names.empty() && view.couldAsk(kEndpointClass)) keepOnly(view, options.names);
@@ -187,7 +185,7 @@ void showHost(const Globals& globals, const ShowOptions& options) {
 void addShowCommand(CommandLine& line) {
   const auto options = std::make_shared<ShowOptions>();
   line.add("show", "The DNS servers and domains of each interface, and who says so")
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .writesJson()
       .examples(
           "  zorvactl show\n"
           "  zorvactl show eth0                            all of one\n"

@@ -6,7 +6,6 @@
 #include "agent/Agent.h"
 #include "cli/commands/Commands.h"
 #include "cli/output/Console.h"
-#include "cli/output/ResultWriter.h"
 #include "cli/output/Text.h"
 #include "cli/output/TreeText.h"
 #include "cli/session/Session.h"
@@ -16,8 +15,6 @@ namespace zorva::cli {
 namespace {
 
 void showTree(const Globals& globals) {
-  requireFormat(globals.output, {OutputFormat::Table, OutputFormat::Json}, "tree");
-  requireLocal(globals, "tree");
   const Session session(globals);
   const std::shared_ptr<const zorva::agent::TreeSnapshot> tree = session.tree();
   write(globals.output == OutputFormat::Json ? zorva::agent::treeToJson(*tree) : treeText(*tree, session.layout()));
@@ -27,7 +24,8 @@ void showTree(const Globals& globals) {
 
 void addTreeCommand(CommandLine& line) {
   line.add("tree", "The agent's instrumentation tree")
-      .writes({OutputFormat::Table, OutputFormat::Json})
+      .writesJson()
+      .local()
       .examples(
           "  zorvactl tree\n"
           "  zorvactl tree --output json > tree.json       to be read back as [tree] source = \"file\"")

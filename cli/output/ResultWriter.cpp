@@ -1,6 +1,5 @@
 #include "cli/output/ResultWriter.h"
 
-#include <algorithm>
 #include <string>
 
 #include "cimxml/ElementWriter.h"
@@ -125,14 +124,6 @@ std::unique_ptr<ResultWriter> makeResultWriter(OutputFormat format, const Layout
       break;
   }
   throw Failure(ExitCode::WrongUsage, std::string("--output ") + formatName(format) + " does not fit these results");
-}
-
-void requireFormat(OutputFormat format, std::initializer_list<OutputFormat> allowed, const char* subcommand) {
-  if (std::find(allowed.begin(), allowed.end(), format) != allowed.end()) return;
-  std::vector<std::string> names;
-  for (const OutputFormat each : allowed) names.emplace_back(formatName(each));
-  throw Failure(ExitCode::WrongUsage, std::string("zorvactl ") + subcommand + " has no output as " + formatName(format),
-                "it writes " + joined(names, ", "));
 }
 
 }  // namespace zorva::cli

@@ -34,7 +34,4 @@ enum class Results { Instances, Names };
 /// Throws Failure (wrong usage) for a format that does not exist for these results.
 std::unique_ptr<ResultWriter> makeResultWriter(OutputFormat format, const Layout& layout, Count count, Results results);
 
-/// Throws Failure (wrong usage) that lists the formats of `subcommand`, unless `format` is one of them.
-void requireFormat(OutputFormat format, std::initializer_list<OutputFormat> allowed, const char* subcommand);
-
 }  // namespace zorva::cli

@@ -174,13 +174,6 @@ bool Session::isThisHost(std::string_view name) const {
          util::sameName(name, zorva::agent::currentConfig().systemName);
 }
 
-void requireLocal(const Globals& globals, const char* subcommand) {
-  if (globals.url.empty()) return;
-  throw Failure(ExitCode::WrongUsage,
-                std::string("zorvactl ") + subcommand + " is about files of this host, which no CIM server hands out",
-                "leave out --url, and run it on the host that is meant");
-}
-
 broker::Selection selectionOf(Session& session, const std::vector<std::string>& properties, const schema::Class* top) {
   broker::Selection selection;
   if (properties.empty()) return selection;

@@ -98,9 +98,6 @@ class Session {
   std::unique_ptr<Operations> cim_;
 };
 
-/// Throws Failure (wrong usage) if a server is used: `subcommand` reads or writes files of this host.
-void requireLocal(const Globals& globals, const char* subcommand);
-
 /// Runs the work and converts the agent's exceptions to Failure: a wrong file is wrong usage, everything else a
 /// failure.
 template <typename Work>
