@@ -1,5 +1,7 @@
 #include "agent/apply/BusObject.h"
 
+#include "agent/sources/BusNames.h"
+
 namespace zorva::agent {
 
 void BusWriter::keep(int result) {
@@ -31,7 +33,7 @@ Expected<void, std::string> BusObject::call(const std::string& interface, const 
 
 Expected<void, std::string> BusObject::readProperties(const std::string& interface, const Each& each) const {
   return call(
-      "org.freedesktop.DBus.Properties", "GetAll", [&](BusWriter& arguments) { arguments.text(interface); },
+      kBusProperties, "GetAll", [&](BusWriter& arguments) { arguments.text(interface); },
       [&](BusReader& reader) { reader.forEachProperty([&](const std::string& name) { each(reader, name); }); });
 }
 

@@ -5,6 +5,7 @@
 #include <string>
 
 #include "agent/apply/BusObject.h"
+#include "agent/sources/BusNames.h"
 #include "agent/tree/Node.h"
 
 namespace zorva::agent {
@@ -37,7 +38,7 @@ struct NetworkManagerProfile {
 };
 
 inline BusObject networkManagerObject(BusCalls& bus, const std::string& path) {
-  return {bus, "org.freedesktop.NetworkManager", path};
+  return {bus, kNetworkManagerService, path};
 }
 
 /// The profile at a path. Errors are those of BusCalls::call().

@@ -10,22 +10,20 @@
 #include "agent/apply/NetworkManagerProfile.h"
 #include "agent/apply/SettingsText.h"
 #include "agent/apply/Writers.h"
+#include "agent/sources/BusNames.h"
 #include "agent/tree/IpAddress.h"
 
 namespace zorva::agent {
 namespace {
 
-constexpr const char* kDaemon = "org.freedesktop.NetworkManager";
-constexpr const char* kManagerPath = "/org/freedesktop/NetworkManager";
+using Family = NetworkManagerProfile::Family;
+using Done = Expected<void, std::string>;
+
 constexpr const char* kSettingsPath = "/org/freedesktop/NetworkManager/Settings";
 constexpr const char* kSettings = "org.freedesktop.NetworkManager.Settings";
-constexpr const char* kDevice = "org.freedesktop.NetworkManager.Device";
 constexpr const char* kActive = "org.freedesktop.NetworkManager.Connection.Active";
 constexpr const char* kLease = "org.freedesktop.NetworkManager.DHCP4Config";
 constexpr std::uint32_t kExternal = 0x80;  // NM_ACTIVATION_STATE_FLAG_EXTERNAL
-
-using Family = NetworkManagerProfile::Family;
-using Done = Expected<void, std::string>;
 
 struct Device {
   std::string path;
@@ -199,12 +197,13 @@ Refusal reasonAgainst(const std::string& interface, const NetworkManagerProfile&
 
 Expected<Device, std::string> NetworkManagerWriter::deviceOf(const std::string& interface) const {
   Device device;
-  Done done = object(kManagerPath)
-                  .call(
-                      kDaemon, "GetDeviceByIpIface", [&](BusWriter& arguments) { arguments.text(interface); },
-                      [&](BusReader& answer) { device.path = answer.text(); });
+  Done done =
+      object(kNetworkManagerPath)
+          .call(
+              kNetworkManagerService, "GetDeviceByIpIface", [&](BusWriter& arguments) { arguments.text(interface); },
+              [&](BusReader& answer) { device.path = answer.text(); });
   if (done) {
-    done = object(device.path).readProperties(kDevice, [&](BusReader& reader, const std::string& name) {
+    done = object(device.path).readProperties(kNetworkManagerDevice, [&](BusReader& reader, const std::string& name) {
       if (name == "Managed") reader.ifVariant("b", [&] { device.isManaged = reader.flag(); });
       if (name == "ActiveConnection") reader.ifPath(device.active);
       if (name == "Dhcp4Config") reader.ifPath(device.lease);
@@ -315,7 +314,7 @@ void NetworkManagerWriter::waitForLeaseToAge(const Device& device) const {
 // What the profile has is used, in the place of what was given when it was activated.
 Done NetworkManagerWriter::reapply(const Device& device) const {
   waitForLeaseToAge(device);
-  return object(device.path).call(kDevice, "Reapply", [](BusWriter& arguments) {
+  return object(device.path).call(kNetworkManagerDevice, "Reapply", [](BusWriter& arguments) {
     arguments.array("{sa{sv}}", [] {});
     arguments.longNumber(0);  // of any version
     arguments.number(0);      // no flags

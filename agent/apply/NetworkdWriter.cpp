@@ -12,6 +12,7 @@
 #include "agent/apply/Writers.h"
 #include "agent/config/Config.h"
 #include "agent/log/LogOutput.h"
+#include "agent/sources/BusNames.h"
 #include "agent/tree/Json.h"
 #include "util/Escape.h"
 #include "util/ReadFile.h"
@@ -25,7 +26,7 @@ constexpr const char* kFileName = "50-zorva.conf";
 constexpr std::size_t kLargestFile = std::size_t{64} << 10;
 
 SystemBus::Method managerMethod(const char* member) {
-  return {"org.freedesktop.network1", "/org/freedesktop/network1", "org.freedesktop.network1.Manager", member};
+  return {kNetworkdService, kNetworkdPath, kNetworkdManager, member};
 }
 
 // The address in a server with port and name: "192.0.2.1:853#name", "[2001:db8::1]:853#name", "2001:db8::1#name".

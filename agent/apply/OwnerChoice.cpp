@@ -5,14 +5,9 @@
 #include <chrono>
 #include <thread>
 
+#include "agent/sources/BusNames.h"
+
 namespace zorva::agent {
-namespace {
-
-constexpr const char* kNetworkManager = "org.freedesktop.NetworkManager";
-constexpr const char* kManagerPath = "/org/freedesktop/NetworkManager";
-
-}  // namespace
-
 OwnerChoice::OwnerChoice(BusCalls& bus, const std::string& root) : bus_(bus), owners_(root) {}
 
 void OwnerChoice::look(const std::vector<Link>& links) {
@@ -50,16 +45,14 @@ Expected<ChosenOwner, Refusal> OwnerChoice::choose(const Link& link) {
 Expected<void, Refusal> OwnerChoice::refuseUnmanaged(const Link& link) {
   std::string device;
   const auto found = bus_.call(
-      {kNetworkManager, kManagerPath, kNetworkManager, "GetDeviceByIpIface"},
+      {kNetworkManagerService, kNetworkManagerPath, kNetworkManagerService, "GetDeviceByIpIface"},
       [&link](sd_bus_message* message) { return ::sd_bus_message_append(message, "s", link.name.c_str()); },
       [&device](BusReader& reader) { device = reader.text(); });
   if (!found) return {};
   bool managed = false;
   const auto asked = bus_.call(
-      {kNetworkManager, device, "org.freedesktop.DBus.Properties", "Get"},
-      [](sd_bus_message* message) {
-        return ::sd_bus_message_append(message, "ss", "org.freedesktop.NetworkManager.Device", "Managed");
-      },
+      {kNetworkManagerService, device, kBusProperties, "Get"},
+      [](sd_bus_message* message) { return ::sd_bus_message_append(message, "ss", kNetworkManagerDevice, "Managed"); },
       [&managed](BusReader& reader) { reader.ifVariant("b", [&] { managed = reader.flag(); }); });
   if (!asked) return unexpected("NetworkManager: " + asked.error());
   if (managed) {

@@ -8,16 +8,12 @@
 #include "agent/apply/BusObject.h"
 #include "agent/apply/SettingsText.h"
 #include "agent/apply/Writers.h"
+#include "agent/sources/BusNames.h"
 #include "agent/tree/IpAddress.h"
 #include "util/Names.h"
 
 namespace zorva::agent {
 namespace {
-
-constexpr const char* kDaemon = "org.freedesktop.resolve1";
-constexpr const char* kManagerPath = "/org/freedesktop/resolve1";
-constexpr const char* kManager = "org.freedesktop.resolve1.Manager";
-constexpr const char* kLink = "org.freedesktop.resolve1.Link";
 
 using Done = Expected<void, std::string>;
 
@@ -115,7 +111,7 @@ Done orRefusal(const DnsTarget& target, const Done& done) {
 
 class ResolvedWriter : public DnsWriter {
  public:
-  explicit ResolvedWriter(BusCalls& bus) : bus_(bus), manager_(bus, kDaemon, kManagerPath) {}
+  explicit ResolvedWriter(BusCalls& bus) : bus_(bus), manager_(bus, kResolvedService, kResolvedPath) {}
 
   DnsSettings asHeld(const DnsSettings& settings) const override;
   Expected<std::string, Refusal> save(const DnsTarget& target) override;
@@ -140,13 +136,14 @@ Expected<LinkDns, Refusal> ResolvedWriter::read(const DnsTarget& target) const {
   LinkDns dns;
   std::string path;
   Done done = manager_.call(
-      kManager, "GetLink", [&](BusWriter& arguments) { arguments.signedNumber(target.index); },
+      kResolvedManager, "GetLink", [&](BusWriter& arguments) { arguments.signedNumber(target.index); },
       [&](BusReader& answer) { path = answer.text(); });
   if (done) {
-    done = BusObject(bus_, kDaemon, path).readProperties(kLink, [&](BusReader& reader, const std::string& name) {
-      if (name == "DNSEx") reader.ifVariant("a(iayqs)", [&] { dns.servers = readServers(reader); });
-      if (name == "Domains") reader.ifVariant("a(sb)", [&] { dns.domains = readDomains(reader); });
-    });
+    done = BusObject(bus_, kResolvedService, path)
+               .readProperties(kResolvedLink, [&](BusReader& reader, const std::string& name) {
+                 if (name == "DNSEx") reader.ifVariant("a(iayqs)", [&] { dns.servers = readServers(reader); });
+                 if (name == "Domains") reader.ifVariant("a(sb)", [&] { dns.domains = readDomains(reader); });
+               });
   }
   if (done) return dns;
   return unexpected(inOneLine(target.interface) + ": systemd-resolved cannot be asked: " + done.error() +
@@ -157,7 +154,7 @@ Expected<LinkDns, Refusal> ResolvedWriter::read(const DnsTarget& target) const {
 Done ResolvedWriter::setServers(int link, const std::vector<Server>& servers) const {
   const bool inFull =
       !std::all_of(servers.begin(), servers.end(), [](const Server& server) { return server.isPlain(); });
-  return manager_.call(kManager, inFull ? "SetLinkDNSEx" : "SetLinkDNS", [&](BusWriter& arguments) {
+  return manager_.call(kResolvedManager, inFull ? "SetLinkDNSEx" : "SetLinkDNS", [&](BusWriter& arguments) {
     arguments.signedNumber(link);
     arguments.array(inFull ? "(iayqs)" : "(iay)", [&] {
       for (const Server& server : servers) writeServer(arguments, server, inFull);
@@ -166,7 +163,7 @@ Done ResolvedWriter::setServers(int link, const std::vector<Server>& servers) co
 }
 
 Done ResolvedWriter::setDomains(int link, const std::vector<Domain>& domains) const {
-  return manager_.call(kManager, "SetLinkDomains", [&](BusWriter& arguments) {
+  return manager_.call(kResolvedManager, "SetLinkDomains", [&](BusWriter& arguments) {
     arguments.signedNumber(link);
     arguments.array("(sb)", [&] {
       for (const Domain& domain : domains) writeDomain(arguments, domain);

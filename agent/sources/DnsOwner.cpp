@@ -5,6 +5,7 @@
 #include <utility>
 
 #include "agent/log/LogOutput.h"
+#include "agent/sources/BusNames.h"
 
 namespace zorva::agent {
 namespace {
@@ -19,6 +20,10 @@ constexpr std::size_t kMostReported = 64;
 }  // namespace
 
 DnsOwner::DnsOwner(Identity identity) : identity_(std::move(identity)) {}
+
+std::string DnsOwner::propertyChangesBelow(const char* path) {
+  return std::string("path_namespace='") + path + "',interface='" + kBusProperties + "',member='PropertiesChanged'";
+}
 
 void DnsOwner::follow(const std::string& rule, SystemBus::Handler handler) {
   subscriptions_.push_back(bus_->listen(rule, std::move(handler)));

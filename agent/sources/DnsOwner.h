@@ -63,6 +63,9 @@ class DnsOwner {
   virtual const DnsFacts* factsOf(const Link& link) const = 0;
 
  protected:
+  /// The match rule of the signals that report changed properties of an object or of those below it.
+  static std::string propertyChangesBelow(const char* path);
+
   /// Calls a method of the daemon. When every call is answered, takeAnswers is called. read is not called where the
   /// daemon refuses; where it throws BusError, this one answer counts as none. To be used by startAsking and by read.
   void ask(const std::string& path, const std::string& interface, const std::string& method,

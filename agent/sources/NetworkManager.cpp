@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <utility>
 
+#include "agent/sources/BusNames.h"
 #include "agent/sources/NetworkManagerValues.h"
 
 namespace zorva::agent {
@@ -13,7 +14,8 @@ constexpr std::size_t kMostProfiles = 1024;
 constexpr std::uint32_t kExternal = 0x80;  // NM_ACTIVATION_STATE_FLAG_EXTERNAL
 
 std::string changesOf(const std::string& interface) {
-  return "interface='org.freedesktop.DBus.Properties',member='PropertiesChanged',arg0='" + (kPrefix + interface) + '\'';
+  return std::string("interface='") + kBusProperties + "',member='PropertiesChanged',arg0='" + (kPrefix + interface) +
+         '\'';
 }
 
 // A list of dictionaries that have the address, with other things, as text.
@@ -49,7 +51,7 @@ DnsOrigin originOf(const StringList& used, const StringList& inProfile) {
 
 NetworkManager::NetworkManager()
     : DnsOwner({"NetworkManager",
-                "org.freedesktop.NetworkManager",
+                kNetworkManagerService,
                 {changesOf("Device"), changesOf("IP4Config"), changesOf("IP6Config"), changesOf("Connection.Active"),
                  "interface='org.freedesktop.NetworkManager.Settings.Connection',member='Updated'"},
                 ""}) {}

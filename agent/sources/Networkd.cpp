@@ -5,12 +5,13 @@
 #include <limits>
 #include <utility>
 
+#include "agent/sources/BusNames.h"
+
 namespace zorva::agent {
 namespace {
 
 using Kind = JsonValue::Kind;
 
-constexpr const char* kPath = "/org/freedesktop/network1";
 constexpr std::size_t kLongestAddress = 16;
 
 const JsonValue* member(const JsonValue& object, const char* name, Kind kind) {
@@ -71,15 +72,13 @@ constexpr std::array kModes{ModeName{"LLMNR", &DnsFacts::llmnr}, ModeName{"MDNS"
 
 Networkd::Networkd(const std::string& root)
     : DnsOwner({"systemd-networkd",
-                "org.freedesktop.network1",
-                {std::string("path_namespace='") + kPath +
-                 "',interface='org.freedesktop.DBus.Properties',member='PropertiesChanged'"},
+                kNetworkdService,
+                {propertyChangesBelow(kNetworkdPath)},
                 root + "/run/systemd/netif/links"}) {}
 
 void Networkd::startAsking(const std::vector<Link>&) {
   answer_.clear();
-  ask(kPath, "org.freedesktop.network1.Manager", "Describe", {},
-      [this](BusReader& reader) { readDescription(reader); });
+  ask(kNetworkdPath, kNetworkdManager, "Describe", {}, [this](BusReader& reader) { readDescription(reader); });
 }
 
 void Networkd::readDescription(BusReader& reader) {

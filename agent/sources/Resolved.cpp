@@ -3,13 +3,11 @@
 #include <algorithm>
 #include <utility>
 
+#include "agent/sources/BusNames.h"
+
 namespace zorva::agent {
 namespace {
 
-constexpr const char* kPath = "/org/freedesktop/resolve1";
-constexpr const char* kManager = "org.freedesktop.resolve1.Manager";
-constexpr const char* kLink = "org.freedesktop.resolve1.Link";
-constexpr const char* kProperties = "org.freedesktop.DBus.Properties";
 constexpr int kHost = 0;  // in the place of a link's index
 constexpr std::size_t kMostLinksWithoutDns = 256;
 
@@ -22,7 +20,7 @@ std::map<int, std::string> namesByIndex(const std::vector<Link>& links) {
 // sd-bus escapes the first character of a number in a path.
 std::string pathOf(int index) {
   const std::string number = std::to_string(index);
-  return std::string(kPath) + "/link/_3" + number;
+  return std::string(kResolvedPath) + "/link/_3" + number;
 }
 
 void readMode(BusReader& reader, const std::string& name, DnsFacts& modes) {
@@ -40,18 +38,17 @@ void readMode(BusReader& reader, const std::string& name, DnsFacts& modes) {
 }  // namespace
 
 Resolved::Resolved(const std::string& root)
-    : DnsOwner(
-          {"systemd-resolved",
-           "org.freedesktop.resolve1",
-           {std::string("path_namespace='") + kPath + "',interface='" + kProperties + "',member='PropertiesChanged'"},
-           root + "/run/systemd/resolve/netif"}) {}
+    : DnsOwner({"systemd-resolved",
+                kResolvedService,
+                {propertyChangesBelow(kResolvedPath)},
+                root + "/run/systemd/resolve/netif"}) {}
 
 bool Resolved::isConcernedBy(const std::vector<Link>& links) const { return namesByIndex(links) != links_; }
 
 void Resolved::startAsking(const std::vector<Link>& links) {
   links_ = namesByIndex(links);
   said_.clear();
-  ask(kPath, kProperties, "GetAll", {kManager}, [this](BusReader& reader) { readManager(reader); });
+  ask(kResolvedPath, kBusProperties, "GetAll", {kResolvedManager}, [this](BusReader& reader) { readManager(reader); });
 }
 
 void Resolved::readManager(BusReader& reader) {
@@ -89,7 +86,7 @@ void Resolved::readDomains(BusReader& reader) {
 }
 
 void Resolved::askForLink(int index) {
-  ask(pathOf(index), kProperties, "GetAll", {kLink}, [this, index](BusReader& reader) {
+  ask(pathOf(index), kBusProperties, "GetAll", {kResolvedLink}, [this, index](BusReader& reader) {
     reader.forEachProperty([&](const std::string& name) { readMode(reader, name, said_[index].modes); });
   });
 }
