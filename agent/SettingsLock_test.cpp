@@ -152,10 +152,14 @@ std::string finishAfter(const TemporaryDirectory& directory, const std::string& 
   return problem;
 }
 
-TEST(SettingsLock, AFileThatWasRewrittenWholeStays) {
+void expectToStay(const std::string& text) {
   const TemporaryDirectory directory;
-  EXPECT_EQ(finishAfter(directory, "HOSTNAME=new\nDOMAINNAME=example.org\nMTU=1500\n"), "");
-  EXPECT_EQ(contentsOf(directory / "ifcfg-eth0"), "HOSTNAME=new\nDOMAINNAME=example.org\nMTU=1500\n");
+  EXPECT_EQ(finishAfter(directory, text), "");
+  EXPECT_EQ(contentsOf(directory / "ifcfg-eth0"), text);
+}
+
+TEST(SettingsLock, AFileThatWasRewrittenWholeStays) {
+  expectToStay("HOSTNAME=new\nDOMAINNAME=example.org\nMTU=1500\n");
 }
 
 TEST(SettingsLock, AFileThatWasCutShortIsPutBack) {
@@ -166,11 +170,7 @@ TEST(SettingsLock, AFileThatWasCutShortIsPutBack) {
   }
 }
 
-TEST(SettingsLock, WhatSomebodyElseWroteMeanwhileStays) {
-  const TemporaryDirectory directory;
-  EXPECT_EQ(finishAfter(directory, "OTHER=1\n"), "");
-  EXPECT_EQ(contentsOf(directory / "ifcfg-eth0"), "OTHER=1\n");
-}
+TEST(SettingsLock, WhatSomebodyElseWroteMeanwhileStays) { expectToStay("OTHER=1\n"); }
 
 TEST(SettingsLock, NothingIsKeptAsideOfWhatIsNoFile) {
   const TemporaryDirectory directory;

@@ -26,46 +26,45 @@ std::string problemOf(const std::string& text, const std::function<void(TomlTabl
   });
 }
 
+struct Values {
+  std::string name = "a";
+  bool flag = true;
+  int number = 3;
+  int small = 4;
+  std::optional<std::vector<std::string>> list;
+};
+
+Values valuesOf(const std::string& text) {
+  const TomlDocument document(text);
+  TomlTable table(document, "t");
+  Values values;
+  table.take("name", values.name);
+  table.take("flag", values.flag);
+  table.take("number", values.number);
+  table.take("small", values.small, 0, 1);
+  table.take("list", values.list, "expected a list");
+  table.finish();
+  return values;
+}
+
 TEST(Toml, AValueThatIsNotThereStaysAsItIs) {
   for (const char* text : {"", "[t]\n"}) {
-    const TomlDocument document(text);
-    TomlTable table(document, "t");
-    std::string name = "a";
-    bool flag = true;
-    int number = 3;
-    std::optional<std::vector<std::string>> list;
-    table.take("name", name);
-    table.take("flag", flag);
-    table.take("number", number);
-    table.take("number", number, 0, 1);
-    table.take("list", list, "expected a list");
-    table.finish();
-    EXPECT_EQ(name, "a");
-    EXPECT_TRUE(flag);
-    EXPECT_EQ(number, 3);
-    EXPECT_EQ(list, std::nullopt);
+    const Values values = valuesOf(text);
+    EXPECT_EQ(values.name, "a");
+    EXPECT_TRUE(values.flag);
+    EXPECT_EQ(values.number, 3);
+    EXPECT_EQ(values.small, 4);
+    EXPECT_EQ(values.list, std::nullopt);
   }
 }
 
 TEST(Toml, ValuesAreTaken) {
-  const TomlDocument document("[t]\nname = 'b'\nflag = false\nnumber = -7\nsmall = 1\nlist = ['x', 'y']\n");
-  TomlTable table(document, "t");
-  std::string name;
-  bool flag = true;
-  int number = 0;
-  int small = 0;
-  std::optional<std::vector<std::string>> list;
-  table.take("name", name);
-  table.take("flag", flag);
-  table.take("number", number);
-  table.take("small", small, 0, 1);
-  table.take("list", list, "expected a list");
-  table.finish();
-  EXPECT_EQ(name, "b");
-  EXPECT_FALSE(flag);
-  EXPECT_EQ(number, -7);
-  EXPECT_EQ(small, 1);
-  EXPECT_EQ(list, (std::vector<std::string>{"x", "y"}));
+  const Values values = valuesOf("[t]\nname = 'b'\nflag = false\nnumber = -7\nsmall = 1\nlist = ['x', 'y']\n");
+  EXPECT_EQ(values.name, "b");
+  EXPECT_FALSE(values.flag);
+  EXPECT_EQ(values.number, -7);
+  EXPECT_EQ(values.small, 1);
+  EXPECT_EQ(values.list, (std::vector<std::string>{"x", "y"}));
 }
 
 TEST(Toml, AValueOfAnotherTypeIsRefusedWithLineAndKey) {
