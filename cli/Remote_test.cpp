@@ -4,26 +4,14 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include <nlohmann/json.hpp>
 #include <regex>
 
-#include "cli/testing/TestHost.h"
+#include "cli/testing/Running.h"
 #include "cli/testing/TestServer.h"
 
 namespace zorva::cli {
 namespace {
 
-using nlohmann::json;
-using testing::AllOf;
-using testing::HasSubstr;
-using testing::Not;
-using testing::StartsWith;
-using zorva::agent::testing::contentsOf;
-
-using Words = std::vector<std::string>;
-
-constexpr const char* kEth0 = R"(ZORVA_DNSProtocolEndPoint.Name="eth0")";
-constexpr const char* kSetting = R"(ZORVA_DNSSettingData.InstanceID="Computer%eth0")";
 constexpr const char* kFile =
     "HOSTNAME=host1\nDOMAINNAME=example.org\nCONFIG_NAME=\nDNSSERVERS=192.0.2.53 \n"
     "DNSSUFFIXES=example.org \n";
@@ -108,7 +96,7 @@ TEST_F(Remote, EnumeratesTheSameInEachFormat) {
 
 TEST_F(Remote, GetsTheSame) {
   for (const char* format : {"table", "json", "mof", "xml"}) {
-    expectSame({"gi", kEth0, "-o", format});
+    expectSame({"gi", kEndpoint, "-o", format});
     expectSame({"gi", kSetting, "-o", format});
   }
   expectSame({"gi", "ZORVA_DNSGeneralSettingData", "--property", "InstanceID"});
@@ -118,21 +106,22 @@ TEST_F(Remote, GetsTheSame) {
 TEST_F(Remote, FollowsTheSameAssociations) {
   for (const char* format : {"table", "json"}) {
     for (const char* name : {"CIM_Dependency", "CIM_ElementSettingData"}) {
-      expectSame({"ai", kEth0, "--assoc-class", name, "-o", format});
-      expectSame({"ain", kEth0, "--assoc-class", name, "-o", format});
-      expectSame({"ri", kEth0, "--result-class", name, "-o", format});
+      expectSame({"ai", kEndpoint, "--assoc-class", name, "-o", format});
+      expectSame({"ain", kEndpoint, "--assoc-class", name, "-o", format});
+      expectSame({"ri", kEndpoint, "--result-class", name, "-o", format});
     }
     expectSame({"rin", R"(ZORVA_RemoteServiceAccessPoint.Name="192.0.2.53")", "-o", format});
   }
-  expectSame({"ai", kEth0, "--result-class", "CIM_RemoteServiceAccessPoint", "--property", "Name"});
-  expectSame({"ain", kEth0, "--assoc-class", "CIM_Dependency", "--role", "Dependent", "--result-role", "Antecedent"});
+  expectSame({"ai", kEndpoint, "--result-class", "CIM_RemoteServiceAccessPoint", "--property", "Name"});
+  expectSame(
+      {"ain", kEndpoint, "--assoc-class", "CIM_Dependency", "--role", "Dependent", "--result-role", "Antecedent"});
   expectSame({"ri", kSetting, "--result-class", "ZORVA_DNSOrderedComponent", "--role", "PartComponent"});
   expectSame({"ain", R"(ZORVA_SPComputerSystem)"});
 }
 
 TEST_F(Remote, FindsTheProfileOfAnEndpoint) {
-  EXPECT_THAT(remote({"ain", kEth0}).out, HasSubstr("interop:CIM_RegisteredProfile.InstanceID="));
-  EXPECT_THAT(local({"ain", kEth0}).out, Not(HasSubstr("CIM_RegisteredProfile")));
+  EXPECT_THAT(remote({"ain", kEndpoint}).out, HasSubstr("interop:CIM_RegisteredProfile.InstanceID="));
+  EXPECT_THAT(local({"ain", kEndpoint}).out, Not(HasSubstr("CIM_RegisteredProfile")));
 }
 
 TEST_F(Remote, DrawsTheSameGraph) {
@@ -178,10 +167,11 @@ TEST_F(Remote, ShowsTheSameButWhatCimDoesNotSay) {
 }
 
 TEST_F(Remote, CallsTheSameMethods) {
-  expectSame({"cm", kEth0, "SetDNSDomain", "DNSDomain=x.example"});
-  expectSame({"cm", kEth0, "SetDNSSuffixSearchOrder", "DNSDomainSuffixSearchOrder=a", "DNSDomainSuffixSearchOrder=b"});
-  expectSame({"cm", kEth0, "SetDNSDomain", "DNSDomain=x", "-o", "json"});
-  expectSame({"cm", kEth0, "SetDNSDomain"});
+  expectSame({"cm", kEndpoint, "SetDNSDomain", "DNSDomain=x.example"});
+  expectSame(
+      {"cm", kEndpoint, "SetDNSSuffixSearchOrder", "DNSDomainSuffixSearchOrder=a", "DNSDomainSuffixSearchOrder=b"});
+  expectSame({"cm", kEndpoint, "SetDNSDomain", "DNSDomain=x", "-o", "json"});
+  expectSame({"cm", kEndpoint, "SetDNSDomain"});
 }
 
 TEST_F(Remote, FailsTheSame) {
@@ -191,8 +181,8 @@ TEST_F(Remote, FailsTheSame) {
   expectSame({"gi", R"(ZORVA_DNSSettingData.Foo="x")"});
   expectSame({"gi", R"(ZORVA_DNSSettingData.InstanceID="x)"});
   expectSame({"ei", "ZORVA_DNSProtocol"});
-  expectSame({"ai", kEth0, "--assoc-class", "CIM_Nothing"});
-  EXPECT_EQ(remote({"ain", kEth0, "--role", "Nobody"}).exitCode, 2);
+  expectSame({"ai", kEndpoint, "--assoc-class", "CIM_Nothing"});
+  EXPECT_EQ(remote({"ain", kEndpoint, "--role", "Nobody"}).exitCode, 2);
   expectSame({"modify", kSetting, "DomainName=a\nb"});
   expectSame({"modify", R"(ZORVA_RemoteServiceAccessPoint.Name="192.0.2.53")", "ElementName=x"});
   expectSame({"dns", "show", "eth7"});
@@ -224,7 +214,7 @@ TEST(RemoteChange, WritesTheSameAsOneWithoutAServer) {
                           {"domain", "eth0", "x.example"},
                           {"suffixes", "set", "a.example", "b.example"},
                           {"suffixes", "remove", "a.example"},
-                          {"modify", kEth0, "DomainName=set.example"}}) {
+                          {"modify", kEndpoint, "DomainName=set.example"}}) {
     Words without = words;
     without.insert(without.end(), {"--log-level", "9999"});
     Words with = words;
@@ -327,13 +317,13 @@ TEST(RemoteFailure, ReportsAnIncompleteAnswer) {
                                  HasSubstr(" broke off: it fell\n")));
 }
 
-constexpr const char* kEth0Name =
+constexpr const char* kEndpointName =
     R"(<INSTANCENAME CLASSNAME="ZORVA_DNSProtocolEndPoint"><KEYBINDING NAME="Name"><KEYVALUE>eth0</KEYVALUE>)"
     "</KEYBINDING></INSTANCENAME>";
 
 TEST(RemoteTrailers, TheCimErrorAfterACompleteAnswerIsShownAndSoIsWhatCameBefore) {
   const Outcome outcome = against(ScriptedServer::failedReply(
-      std::string("<IRETURNVALUE>") + kEth0Name + "</IRETURNVALUE>", "6", "it%20is%20gone"));
+      std::string("<IRETURNVALUE>") + kEndpointName + "</IRETURNVALUE>", "6", "it%20is%20gone"));
   EXPECT_EQ(outcome.exitCode, 1);
   EXPECT_EQ(outcome.out, "ZORVA_DNSProtocolEndPoint.Name=\"eth0\"\n");
   EXPECT_THAT(outcome.err, HasSubstr("ZORVA_DNSSettingData: CIM_ERR_NOT_FOUND (6): it is gone\n"));
@@ -352,7 +342,7 @@ TEST(RemoteTrailers, AGraphContinuesAfterThem) {
   const ScriptedServer server([&](const std::string& request) -> std::optional<std::string> {
     const bool isEndpoint = has(request, "ZORVA_DNSProtocolEndPoint");
     if (has(request, "\r\nCIMMethod: EnumerateInstanceNames\r\n")) {
-      return isEndpoint ? ScriptedServer::cimReply(std::string("<IRETURNVALUE>") + kEth0Name + "</IRETURNVALUE>")
+      return isEndpoint ? ScriptedServer::cimReply(std::string("<IRETURNVALUE>") + kEndpointName + "</IRETURNVALUE>")
                         : ScriptedServer::failedReply("<IRETURNVALUE/>", "7", "not%20here");
     }
     if (has(request, "\r\nCIMMethod: GetInstance\r\n")) {

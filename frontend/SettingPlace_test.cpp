@@ -16,7 +16,6 @@
 namespace zorva::frontend {
 namespace {
 
-using ::testing::EndsWith;
 using ::testing::HasSubstr;
 using zorva::agent::testing::TemporaryDirectory;
 
@@ -87,7 +86,7 @@ TEST_F(SettingPlaceTest, NeedsTheDataDirectory) {
   const broker::Instance endpoint = instance("ZORVA_DNSProtocolEndPoint");
   EXPECT_EQ(missingPlace(endpoint, "Hostname"), std::nullopt);
   std::filesystem::remove(directory_ / "data");
-  EXPECT_THAT(missingPlace(endpoint, "Hostname").value_or(""), EndsWith("data/ does not exist"));
+  EXPECT_THAT(missingPlace(endpoint, "Hostname").value_or(""), ::testing::EndsWith("data/ does not exist"));
   EXPECT_THAT(reason("DomainName"), testing::MatchesRegex("the data directory .*data/ does not exist"));
 }
 

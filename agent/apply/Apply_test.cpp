@@ -15,15 +15,10 @@
 namespace zorva::agent {
 namespace {
 
+using namespace testing;
 using namespace ZV::NodeLexicon;
 using std::chrono::seconds;
-using testing::ApplyHost;
-using testing::contentsOf;
-using testing::Daemons;
 using ::testing::HasSubstr;
-using testing::onPlainHost;
-using testing::outputOf;
-using testing::writeFile;
 
 constexpr const char* kFile = "/etc/resolv.conf";
 constexpr const char* kState = "/var/lib/zorvagent/applied/state.json";
@@ -32,7 +27,7 @@ constexpr const char* kFirst = "nameserver 192.0.2.1\n";
 constexpr const char* kSecond = "nameserver 192.0.2.2\n";
 
 bool onHostWithDaemons(const std::function<void(ApplyHost&)>& work) {
-  return testing::succeedsOnHostWithDaemons([&] {
+  return succeedsOnHostWithDaemons([&] {
     writeFile(kFile, kBefore);
     ApplyHost host;
     work(host);
@@ -67,7 +62,7 @@ TEST(Trial, ThatEndsIsTakenBackByAnyProcess) {
     EXPECT_FALSE(pendingTrial().has_value());
     EXPECT_TRUE(endTrial().empty());
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
-    EXPECT_TRUE(testing::succeedsInChild([&] {
+    EXPECT_TRUE(succeedsInChild([&] {
       host.apply({}, onTrial(seconds(60)));
       return contentsOf(kFile) == kFirst;
     }));
@@ -297,11 +292,11 @@ TEST(Applying, WaitsForAnotherProcessThatApplies) {
   EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
     auto lock = std::make_unique<FileLock>(appliedDirectory("/var/lib/zorvagent/") + "lock");
-    const pid_t child = testing::startChild([&] { return host.apply() != ""; });
+    const pid_t child = startChild([&] { return host.apply() != ""; });
     std::this_thread::sleep_for(std::chrono::milliseconds(300));
     EXPECT_EQ(contentsOf(kFile), kBefore);
     lock.reset();
-    EXPECT_TRUE(testing::succeeded(child));
+    EXPECT_TRUE(succeeded(child));
     EXPECT_EQ(contentsOf(kFile), kFirst);
   }));
 }
@@ -339,7 +334,7 @@ TEST(AValueThatIsSet, IsAFailureWhereTheHostRefusesIt) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
   EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost&) {
     applyToHost();
-    testing::LogLines log;
+    LogLines log;
     EXPECT_FALSE(setServers("eth0", {"224.0.0.1"}));
     ASSERT_EQ(log.lines.size(), 1U);
     EXPECT_EQ(log.lines.front(),

@@ -16,19 +16,12 @@
 namespace zorva::agent {
 namespace {
 
+using namespace testing;
 using ::testing::AllOf;
-using testing::contentsOf;
-using testing::Daemons;
-using testing::FakeDaemon;
 using ::testing::HasSubstr;
-using testing::makeCables;
-using testing::makeLeases;
 using ::testing::Not;
-using testing::Observer;
-using testing::outputOf;
-using testing::soon;
-using testing::succeedsOnHostWithDaemons;
-using testing::writeFile;
+
+class NetworkManagerWriter : public PrivateHostTest {};
 
 constexpr const char* kSocket = "/run/dbus/system_bus_socket";
 constexpr const char* kProfiles = "/etc/NetworkManager/system-connections/";
@@ -129,8 +122,7 @@ bool aChangeIsShown() {
   return host.shows({"192.0.2.53", "192.0.2.54", "2001:db8::53"}, {"lan.example.org", "six.example"});
 }
 
-TEST(NetworkManagerWriter, ChangesDnsAndNothingElseAndPutsItBack) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(NetworkManagerWriter, ChangesDnsAndNothingElseAndPutsItBack) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(aChangeIsShown));
 }
 
@@ -147,10 +139,7 @@ bool aChangeOutlivesTheDaemon() {
   return true;
 }
 
-TEST(NetworkManagerWriter, AChangeIsOnDisk) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnHostWithDaemons(aChangeOutlivesTheDaemon));
-}
+TEST_F(NetworkManagerWriter, AChangeIsOnDisk) { EXPECT_TRUE(succeedsOnHostWithDaemons(aChangeOutlivesTheDaemon)); }
 
 // NetworkManager gives no password to those who ask for a profile. Any connection may have these settings.
 bool aPasswordStays() {
@@ -173,10 +162,7 @@ bool aPasswordStays() {
   return true;
 }
 
-TEST(NetworkManagerWriter, KeepsPasswords) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnHostWithDaemons(aPasswordStays));
-}
+TEST_F(NetworkManagerWriter, KeepsPasswords) { EXPECT_TRUE(succeedsOnHostWithDaemons(aPasswordStays)); }
 
 // The sections of profiles of many types, other than [connection] and those of IP; with the passwords and keys of each.
 const std::string kKey = "AAECAwQFBgcICQoLDA0ODxAREhMUFRYXGBkaGxwdHh8=";
@@ -246,8 +232,7 @@ bool profilesOfAllTypesAreKept() {
   return true;
 }
 
-TEST(NetworkManagerWriter, KeepsAllElseInProfilesOfAllTypes) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(NetworkManagerWriter, KeepsAllElseInProfilesOfAllTypes) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(profilesOfAllTypesAreKept));
 }
 
@@ -279,8 +264,7 @@ bool learnedServersComeBack() {
   return true;
 }
 
-TEST(NetworkManagerWriter, ReplacesALeasesServersAndGivesThemBack) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(NetworkManagerWriter, ReplacesALeasesServersAndGivesThemBack) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(learnedServersComeBack));
 }
 
@@ -309,8 +293,7 @@ bool aFamilyThatIsOffIsNamed() {
   return true;
 }
 
-TEST(NetworkManagerWriter, RefusesServersOfAFamilyThatIsOff) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(NetworkManagerWriter, RefusesServersOfAFamilyThatIsOff) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(aFamilyThatIsOffIsNamed));
 }
 
@@ -328,8 +311,7 @@ bool whatIsNotUsedIsPutBack() {
   return true;
 }
 
-TEST(NetworkManagerWriter, PutsTheProfileBackWhereItIsNotUsed) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(NetworkManagerWriter, PutsTheProfileBackWhereItIsNotUsed) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(whatIsNotUsedIsPutBack));
 }
 
@@ -349,8 +331,7 @@ bool aReadOnlyFileSystemIsNamed() {
   return true;
 }
 
-TEST(NetworkManagerWriter, AReadOnlyFileSystemLeavesTheOldState) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(NetworkManagerWriter, AReadOnlyFileSystemLeavesTheOldState) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(aReadOnlyFileSystemIsNamed));
 }
 
@@ -386,8 +367,7 @@ bool foreignProfilesAreNamed() {
   return true;
 }
 
-TEST(NetworkManagerWriter, RefusesProfilesThatAreNotItsOwnToChange) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(NetworkManagerWriter, RefusesProfilesThatAreNotItsOwnToChange) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(foreignProfilesAreNamed));
 }
 
@@ -398,13 +378,12 @@ bool devicesWithoutAProfileAreNamed() {
   outputOf("nmcli device set tun1 managed no");
   EXPECT_EQ(host.refusalOf(kWanted, "tun1"),
             "tun1 is unmanaged by NetworkManager; 'nmcli device set tun1 managed yes' changes that");
-  testing::Interfaces().addAddress("far0", "203.0.113.5", 24);
+  Interfaces().addAddress("far0", "203.0.113.5", 24);
   EXPECT_TRUE(soon([&] { return host.refusalOf(kWanted, "far0").find("only follows it") != std::string::npos; }));
   return true;
 }
 
-TEST(NetworkManagerWriter, RefusesDevicesWithoutAProfile) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(NetworkManagerWriter, RefusesDevicesWithoutAProfile) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(devicesWithoutAProfileAreNamed));
 }
 
@@ -421,8 +400,7 @@ bool aHostileNameStaysOnItsLine() {
   return true;
 }
 
-TEST(NetworkManagerWriter, AHostileNameStaysOnItsLine) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(NetworkManagerWriter, AHostileNameStaysOnItsLine) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(aHostileNameStaysOnItsLine));
 }
 
@@ -440,8 +418,7 @@ bool aFrozenDaemonIsNotWaitedForForEver() {
   return true;
 }
 
-TEST(NetworkManagerWriter, AFrozenDaemonIsNotWaitedForForEver) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(NetworkManagerWriter, AFrozenDaemonIsNotWaitedForForEver) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(aFrozenDaemonIsNotWaitedForForEver));
 }
 
@@ -477,8 +454,7 @@ bool aDaemonThatDiesIsNamed() {
   return true;
 }
 
-TEST(NetworkManagerWriter, ADaemonThatDiesInTheMiddleIsNamed) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(NetworkManagerWriter, ADaemonThatDiesInTheMiddleIsNamed) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(aDaemonThatDiesIsNamed));
 }
 
@@ -495,12 +471,11 @@ bool aDeletedProfileNeedsNothing() {
   return true;
 }
 
-TEST(NetworkManagerWriter, ADeletedProfileNeedsNothing) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(NetworkManagerWriter, ADeletedProfileNeedsNothing) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(aDeletedProfileNeedsNothing));
 }
 
-TEST(NetworkManagerWriter, KnowsTheOrderInWhichServersAreShown) {
+TEST(NetworkManagerServers, HaveTheOrderInWhichServersAreShown) {
   BusCalls bus("/absent");
   const DnsSettings held = makeNetworkManagerWriter(bus)->asHeld(
       {{"2001:DB8:0::1", "192.0.2.2", "fe80::1%eth0", "192.0.2.1", "192.0.2.2", "2001:db8::1"},

@@ -12,11 +12,7 @@
 namespace zorva::agent {
 namespace {
 
-using testing::ApplyHost;
-using testing::contentsOf;
-using testing::Daemons;
-using testing::outputOf;
-using testing::writeFile;
+using namespace testing;
 
 constexpr const char* kLan = "/etc/systemd/network/10-lan.network";
 constexpr const char* kLanDropIn = "/etc/systemd/network/10-lan.network.d/50-zorva.conf";
@@ -56,7 +52,7 @@ struct NetworkdHost : ApplyHost {
 };
 
 bool onNetworkdHost(const std::function<void(NetworkdHost&)>& work) {
-  return testing::succeedsOnHostWithDaemons([&] {
+  return succeedsOnHostWithDaemons([&] {
     NetworkdHost host;
     work(host);
     return true;
@@ -202,7 +198,7 @@ TEST(NetworkdWriter, AReloadThatIsRefusedLeavesTheFilesAsTheyWere) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
   EXPECT_TRUE(onNetworkdHost([](NetworkdHost& host) {
     const unsigned int index = ::if_nametoindex("eth0");
-    const testing::FakeDaemon fake("org.freedesktop.network1", [&](sd_bus_message* answer, const std::string& method) {
+    const FakeDaemon fake("org.freedesktop.network1", [&](sd_bus_message* answer, const std::string& method) {
       const std::string links = "{\"Interfaces\":[{\"Index\":" + std::to_string(index) +
                                 ",\"Name\":\"eth0\",\"NetworkFile\":\"" + kLan + "\"}]}";
       return method == "Describe" ? ::sd_bus_message_append(answer, "s", links.c_str()) : -1;
@@ -221,12 +217,11 @@ TEST(NetworkdWriter, AFileOutsideOfItsDirectoriesIsRefused) {
     const unsigned int index = ::if_nametoindex("eth0");
     for (const std::string file : {"/etc/passwd", "/etc/systemd/network/../../passwd.network",
                                    "/etc/systemd/network/.network", "/etc/systemd/network/x"}) {
-      const testing::FakeDaemon fake(
-          "org.freedesktop.network1", [&](sd_bus_message* answer, const std::string& method) {
-            const std::string links = "{\"Interfaces\":[{\"Index\":" + std::to_string(index) +
-                                      ",\"Name\":\"eth0\",\"NetworkFile\":\"" + file + "\"}]}";
-            return method == "Describe" ? ::sd_bus_message_append(answer, "s", links.c_str()) : 0;
-          });
+      const FakeDaemon fake("org.freedesktop.network1", [&](sd_bus_message* answer, const std::string& method) {
+        const std::string links = "{\"Interfaces\":[{\"Index\":" + std::to_string(index) +
+                                  ",\"Name\":\"eth0\",\"NetworkFile\":\"" + file + "\"}]}";
+        return method == "Describe" ? ::sd_bus_message_append(answer, "s", links.c_str()) : 0;
+      });
       host.want("eth0", "DNSSERVERS=192.0.2.99\n");
       EXPECT_EQ(host.apply(), "eth0: PROBLEM systemd-networkd has eth0 from '" + file +
                                   "', which is no .network file that a drop-in can be put beside\n");
@@ -272,7 +267,7 @@ TEST(NetworkdWriter, TheCLibraryAsksTheServerThatWasSet) {
     writeFile("/etc/resolv.conf", "nameserver 127.0.0.53\n");
     host.want("eth0", "DNSSERVERS=192.0.2.99\n");
     const auto askedFor = [](const std::string& name) {
-      testing::DnsListeners listeners({"192.0.2.53", "192.0.2.99"}, testing::DnsListeners::kNoSuchName);
+      DnsListeners listeners({"192.0.2.53", "192.0.2.99"}, DnsListeners::kNoSuchName);
       listeners.lookUp(name);
       return listeners.asked;
     };
@@ -297,7 +292,7 @@ TEST(NetworkdWriter, AProcessThatIsKilledLeavesTheOldStateOrTheNewOne) {
     EXPECT_EQ(filesOfNetworkd(), before);
     constexpr int kDeaths = 16;
     for (int death = 0; death < kDeaths; ++death) {
-      testing::killAfter(std::chrono::milliseconds(5 * death), [] { ApplyHost::apply(); });
+      killAfter(std::chrono::milliseconds(5 * death), [] { ApplyHost::apply(); });
       const std::string left = filesOfNetworkd();
       EXPECT_TRUE(left == before || left == after) << left;
       host.revert();

@@ -11,15 +11,11 @@
 namespace zorva::agent {
 namespace {
 
+using namespace testing;
 using ::testing::AllOf;
-using testing::Daemons;
 using ::testing::HasSubstr;
-using testing::makeCables;
-using testing::Observer;
-using testing::outputOf;
-using testing::soon;
-using testing::succeedsOnHostWithDaemons;
-using testing::writeFile;
+
+class ResolvedWriter : public PrivateHostTest {};
 
 constexpr const char* kSocket = "/run/dbus/system_bus_socket";
 
@@ -81,8 +77,7 @@ bool aChangeIsShown() {
   return true;
 }
 
-TEST(ResolvedWriter, ChangesServersAndDomainsAndPutsThemBack) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(ResolvedWriter, ChangesServersAndDomainsAndPutsThemBack) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(aChangeIsShown));
 }
 
@@ -99,10 +94,7 @@ bool nothingComesBack() {
   return true;
 }
 
-TEST(ResolvedWriter, ALinkThatHadNothingHasNothingAgain) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnHostWithDaemons(nothingComesBack));
-}
+TEST_F(ResolvedWriter, ALinkThatHadNothingHasNothingAgain) { EXPECT_TRUE(succeedsOnHostWithDaemons(nothingComesBack)); }
 
 bool theNoteIsTrue() {
   Host host;
@@ -120,10 +112,7 @@ bool theNoteIsTrue() {
   return soon([&] { return !host.owners["eth0"].saysAnything(); });
 }
 
-TEST(ResolvedWriter, AChangeLastsUntilTheHostRestarts) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnHostWithDaemons(theNoteIsTrue));
-}
+TEST_F(ResolvedWriter, AChangeLastsUntilTheHostRestarts) { EXPECT_TRUE(succeedsOnHostWithDaemons(theNoteIsTrue)); }
 
 bool refusalsLeaveTheOldState() {
   Host host;
@@ -146,10 +135,7 @@ bool refusalsLeaveTheOldState() {
   return true;
 }
 
-TEST(ResolvedWriter, ARefusalLeavesTheOldState) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnHostWithDaemons(refusalsLeaveTheOldState));
-}
+TEST_F(ResolvedWriter, ARefusalLeavesTheOldState) { EXPECT_TRUE(succeedsOnHostWithDaemons(refusalsLeaveTheOldState)); }
 
 }  // namespace
 }  // namespace zorva::agent

@@ -17,16 +17,9 @@
 namespace zorva::agent {
 namespace {
 
-using testing::Daemons;
-using testing::Interfaces;
-using testing::LogLines;
-using testing::makeCables;
-using testing::makeLeases;
-using testing::Observer;
-using testing::outputOf;
-using testing::soon;
-using testing::succeedsOnHostWithDaemons;
-using testing::writeFile;
+using namespace testing;
+
+class Owners : public PrivateHostTest {};
 
 bool resolvedIsShown() {
   makeCables();
@@ -52,10 +45,7 @@ bool resolvedIsShown() {
   return true;
 }
 
-TEST(Owners, ResolvedIsShownAndItsChangesAreNoticed) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnHostWithDaemons(resolvedIsShown));
-}
+TEST_F(Owners, ResolvedIsShownAndItsChangesAreNoticed) { EXPECT_TRUE(succeedsOnHostWithDaemons(resolvedIsShown)); }
 
 bool comingAndGoingIsNoticed() {
   makeCables();
@@ -78,10 +68,7 @@ bool comingAndGoingIsNoticed() {
   return true;
 }
 
-TEST(Owners, ComingGoingAndRestartsAreNoticed) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnHostWithDaemons(comingAndGoingIsNoticed));
-}
+TEST_F(Owners, ComingGoingAndRestartsAreNoticed) { EXPECT_TRUE(succeedsOnHostWithDaemons(comingAndGoingIsNoticed)); }
 
 bool frozenOneIsWaitedForOnce() {
   using Clock = std::chrono::steady_clock;
@@ -111,8 +98,7 @@ bool frozenOneIsWaitedForOnce() {
   return true;
 }
 
-TEST(Owners, OneThatHangsIsWaitedForOnceAndBelievedMeanwhile) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(Owners, OneThatHangsIsWaitedForOnceAndBelievedMeanwhile) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(frozenOneIsWaitedForOnce));
 }
 
@@ -134,10 +120,7 @@ bool frozenBusIsWaitedForOnce() {
   return true;
 }
 
-TEST(Owners, ABusThatHangsIsWaitedForOnce) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnHostWithDaemons(frozenBusIsWaitedForOnce));
-}
+TEST_F(Owners, ABusThatHangsIsWaitedForOnce) { EXPECT_TRUE(succeedsOnHostWithDaemons(frozenBusIsWaitedForOnce)); }
 
 std::size_t openDescriptors() {
   const std::filesystem::directory_iterator all("/proc/self/fd");
@@ -152,7 +135,7 @@ bool forkedProcessHasItsOwnConnection() {
   Observer host;
   EXPECT_EQ(host["eth0"].servers, StringList{"192.0.2.53"});
   const std::size_t before = openDescriptors();
-  EXPECT_TRUE(testing::succeedsInChild([&] {
+  EXPECT_TRUE(succeedsInChild([&] {
     host.owners().reopen();
     const bool closed = openDescriptors() == before - 1;
     host.lookAgain();
@@ -164,8 +147,7 @@ bool forkedProcessHasItsOwnConnection() {
   return outputOf("true; exec ls -l /proc/self/fd").find("socket") == std::string::npos;
 }
 
-TEST(Owners, AForkedProcessHasItsOwnConnectionAndNoOtherProgramHasOne) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(Owners, AForkedProcessHasItsOwnConnectionAndNoOtherProgramHasOne) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(forkedProcessHasItsOwnConnection));
 }
 
@@ -174,7 +156,7 @@ bool everybodyNoticesWhatIsNotSignalled() {
   Daemons daemons;
   daemons.start("systemd-resolved");
   // Root changes what nobody watches the private directory for.
-  const pid_t observer = testing::startChild([] {
+  const pid_t observer = startChild([] {
     if (::setresuid(65534, 65534, 65534) != 0) return false;
     Observer host;
     const bool before = host["eth0"].llmnr == "yes";
@@ -183,11 +165,10 @@ bool everybodyNoticesWhatIsNotSignalled() {
   });
   EXPECT_TRUE(soon([] { return std::filesystem::exists("/tmp/looked"); }));
   outputOf("resolvectl llmnr eth0 no");
-  return testing::succeeded(observer);
+  return succeeded(observer);
 }
 
-TEST(Owners, ChangesWithoutASignalAreNoticedByProcessesWithoutRights) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(Owners, ChangesWithoutASignalAreNoticedByProcessesWithoutRights) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(everybodyNoticesWhatIsNotSignalled));
 }
 
@@ -202,8 +183,7 @@ bool everyNameIsTheRoot() {
   return soon([&] { return host["eth0"].routingDomains == StringList{"."}; });
 }
 
-TEST(Owners, ARoutingDomainForEveryNameIsShownAsTheRoot) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(Owners, ARoutingDomainForEveryNameIsShownAsTheRoot) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(everyNameIsTheRoot));
 }
 
@@ -233,10 +213,7 @@ bool leasesAreLearned() {
   return true;
 }
 
-TEST(Owners, WhatALeaseBringsIsLearned) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnHostWithDaemons(leasesAreLearned));
-}
+TEST_F(Owners, WhatALeaseBringsIsLearned) { EXPECT_TRUE(succeedsOnHostWithDaemons(leasesAreLearned)); }
 
 }  // namespace
 }  // namespace zorva::agent

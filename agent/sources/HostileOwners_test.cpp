@@ -6,6 +6,7 @@
 #include <array>
 #include <string>
 
+#include "agent/sources/BusNames.h"
 #include "agent/sources/DnsOwners.h"
 #include "agent/testing/FakeDaemon.h"
 #include "agent/testing/LogLines.h"
@@ -16,13 +17,9 @@
 namespace zorva::agent {
 namespace {
 
-using testing::Daemons;
-using testing::FakeDaemon;
-using testing::succeedsOnHostWithDaemons;
+using namespace testing;
 
-constexpr const char* kResolved = "org.freedesktop.resolve1";
-constexpr const char* kNetworkManager = "org.freedesktop.NetworkManager";
-constexpr const char* kNetworkd = "org.freedesktop.network1";
+class HostileOwners : public PrivateHostTest {};
 
 // What comes of an owner's answer for the interface eth0, in a process of its own host.
 struct Outcome {
@@ -33,10 +30,10 @@ struct Outcome {
 Outcome outcomeOf(const std::string& busName, const FakeDaemon::Answer& answer) {
   Daemons daemons;
   const FakeDaemon fake(busName, answer);
-  testing::Interfaces interfaces;
+  Interfaces interfaces;
   interfaces.addBridge("eth0");
   Outcome outcome;
-  const testing::LogLines log;
+  const LogLines log;
   const std::vector<Link> links = LinkReader().read().links;
   DnsOwners owners("");
   owners.look(links);
@@ -78,7 +75,7 @@ int answerServers(sd_bus_message* message, Fill fill) {
 }
 
 bool wrongServersAreLeftOut() {
-  const Outcome outcome = outcomeOf(kResolved, [](sd_bus_message* answer, const std::string&) {
+  const Outcome outcome = outcomeOf(kResolvedService, [](sd_bus_message* answer, const std::string&) {
     return answerServers(answer, [&] {
       for (const std::size_t bytes : {0U, 3U, 4U, 17U, 64U}) addServer(answer, bytes);
       addServer(answer, 4, "a\x1B[2J.example");
@@ -90,13 +87,10 @@ bool wrongServersAreLeftOut() {
   return true;
 }
 
-TEST(HostileOwners, ServersThatAreNoneAreLeftOut) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnHostWithDaemons(wrongServersAreLeftOut));
-}
+TEST_F(HostileOwners, ServersThatAreNoneAreLeftOut) { EXPECT_TRUE(succeedsOnHostWithDaemons(wrongServersAreLeftOut)); }
 
 bool tooManyAreCut() {
-  const Outcome outcome = outcomeOf(kResolved, [](sd_bus_message* answer, const std::string&) {
+  const Outcome outcome = outcomeOf(kResolvedService, [](sd_bus_message* answer, const std::string&) {
     return answerServers(answer, [&] {
       for (int i = 0; i < 20000; ++i) addServer(answer, 4);
     });
@@ -106,13 +100,10 @@ bool tooManyAreCut() {
   return true;
 }
 
-TEST(HostileOwners, TooManyServersAreCut) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnHostWithDaemons(tooManyAreCut));
-}
+TEST_F(HostileOwners, TooManyServersAreCut) { EXPECT_TRUE(succeedsOnHostWithDaemons(tooManyAreCut)); }
 
 bool wrongDomainsAreLeftOut() {
-  const Outcome outcome = outcomeOf(kResolved, [](sd_bus_message* answer, const std::string&) {
+  const Outcome outcome = outcomeOf(kResolvedService, [](sd_bus_message* answer, const std::string&) {
     const int eth0 = indexOfEth0();
     return ::sd_bus_message_append(answer, "a{sv}", 2, "Domains", "a(isb)", 5, eth0, "good.example", 0, eth0,
                                    "line\nfeed.example", 0, eth0, "", 0, eth0, "a..b", 1, eth0, "~.", 0,  //
@@ -123,14 +114,11 @@ bool wrongDomainsAreLeftOut() {
   return true;
 }
 
-TEST(HostileOwners, DomainsThatAreNoneAreLeftOut) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnHostWithDaemons(wrongDomainsAreLeftOut));
-}
+TEST_F(HostileOwners, DomainsThatAreNoneAreLeftOut) { EXPECT_TRUE(succeedsOnHostWithDaemons(wrongDomainsAreLeftOut)); }
 
 // Answers of every other form than the right one.
 bool otherFormsSayNothing() {
-  for (const char* name : {kResolved, kNetworkManager, kNetworkd}) {
+  for (const char* name : {kResolvedService, kNetworkManagerService, kNetworkdService}) {
     for (int form = 0; form < 6; ++form) {
       const Outcome outcome = outcomeOf(name, [form](sd_bus_message* answer, const std::string&) {
         if (form == 0) return -1;
@@ -138,23 +126,20 @@ bool otherFormsSayNothing() {
         if (form == 2) return ::sd_bus_message_append(answer, "s", "{\"Interfaces\": [[[[[\"no link\"]]]]]}");
         if (form == 3) return ::sd_bus_message_append(answer, "s", "no JSON");
         if (form == 4) return ::sd_bus_message_append(answer, "a{sv}", 2, "DNSEx", "s", "text", "Domains", "b", 1);
-        return ::sd_bus_message_append(answer, "a{oa{sa{sv}}}", 1, "/", 1, "org.freedesktop.NetworkManager.Device", 3,
-                                       "Interface", "s", "eth0", "Managed", "s", "yes", "Ip4Config", "o", "/none");
+        return ::sd_bus_message_append(answer, "a{oa{sa{sv}}}", 1, "/", 1, kNetworkManagerDevice, 3, "Interface", "s",
+                                       "eth0", "Managed", "s", "yes", "Ip4Config", "o", "/none");
       });
       EXPECT_FALSE(outcome.facts.saysAnything()) << name << ' ' << form;
-      testing::Interfaces().remove("eth0");
+      Interfaces().remove("eth0");
     }
   }
   return true;
 }
 
-TEST(HostileOwners, AnswersOfAnotherFormSayNothing) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnHostWithDaemons(otherFormsSayNothing));
-}
+TEST_F(HostileOwners, AnswersOfAnotherFormSayNothing) { EXPECT_TRUE(succeedsOnHostWithDaemons(otherFormsSayNothing)); }
 
 bool wrongProfileIsLeftOut() {
-  const Outcome outcome = outcomeOf(kNetworkManager, [](sd_bus_message* answer, const std::string& method) {
+  const Outcome outcome = outcomeOf(kNetworkManagerService, [](sd_bus_message* answer, const std::string& method) {
     if (method != "GetManagedObjects") return -1;
     const std::string prefix = "org.freedesktop.NetworkManager.";
     return ::sd_bus_message_append(
@@ -174,8 +159,7 @@ bool wrongProfileIsLeftOut() {
   return true;
 }
 
-TEST(HostileOwners, AProfileNameWithControlCharactersIsLeftOut) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(HostileOwners, AProfileNameWithControlCharactersIsLeftOut) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(wrongProfileIsLeftOut));
 }
 
@@ -186,14 +170,13 @@ bool sendFalseSignals() {
   if (::sd_bus_open_system(&bus) < 0 || ::sd_bus_list_names(bus, &names, nullptr) < 0) return false;
   for (char** name = names; *name != nullptr; ++name) {
     sd_bus_message* signal = nullptr;
-    ::sd_bus_message_new_signal(bus, &signal, "/org/freedesktop/resolve1", "org.freedesktop.DBus.Properties",
-                                "PropertiesChanged");
-    ::sd_bus_message_append(signal, "sa{sv}as", "org.freedesktop.resolve1.Manager", 0, 0);
+    ::sd_bus_message_new_signal(bus, &signal, kResolvedPath, kBusProperties, "PropertiesChanged");
+    ::sd_bus_message_append(signal, "sa{sv}as", kResolvedManager, 0, 0);
     ::sd_bus_message_set_destination(signal, *name);
     ::sd_bus_send(bus, signal, nullptr);
     ::sd_bus_message_unref(signal);
   }
-  return ::sd_bus_flush(bus) >= 0 && ::sd_bus_get_name_creds(bus, kResolved, 0, nullptr) >= 0;
+  return ::sd_bus_flush(bus) >= 0 && ::sd_bus_get_name_creds(bus, kResolvedService, 0, nullptr) >= 0;
 }
 
 bool strangersSignalsAreIgnored() {
@@ -205,13 +188,12 @@ bool strangersSignalsAreIgnored() {
   owners.changed();
   owners.look(links);
   EXPECT_FALSE(owners.changed());
-  EXPECT_TRUE(testing::succeedsInChild(sendFalseSignals));
+  EXPECT_TRUE(succeedsInChild(sendFalseSignals));
   EXPECT_FALSE(owners.changed());
   return true;
 }
 
-TEST(HostileOwners, SignalsOfStrangersAreIgnored) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(HostileOwners, SignalsOfStrangersAreIgnored) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(strangersSignalsAreIgnored));
 }
 

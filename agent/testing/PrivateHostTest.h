@@ -22,4 +22,10 @@ inline bool succeedsOnHostWithDaemons(const std::function<bool()>& work) {
   }                                                                                                             \
   static_assert(true, "a semicolon ends it")
 
+/// Tests of which every one needs private hosts.
+class PrivateHostTest : public ::testing::Test {
+ protected:
+  void SetUp() override { ZORVAGENT_NEEDS_PRIVATE_HOST(); }
+};
+
 }  // namespace zorva::agent::testing

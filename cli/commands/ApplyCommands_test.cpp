@@ -11,18 +11,15 @@
 namespace zorva::cli {
 namespace {
 
+using namespace zorva::agent::testing;
 using ::testing::AllOf;
 using ::testing::EndsWith;
 using ::testing::HasSubstr;
 using ::testing::Not;
 using ::testing::StartsWith;
-using zorva::agent::testing::contentsOf;
-using zorva::agent::testing::Daemons;
-using zorva::agent::testing::Interfaces;
-using zorva::agent::testing::outputOf;
-using zorva::agent::testing::succeedsOnHostWithDaemons;
-using zorva::agent::testing::succeedsOnPrivateHost;
-using zorva::agent::testing::writeFile;
+
+class ApplyCommands : public PrivateHostTest {};
+class ApplyToHost : public PrivateHostTest {};
 
 constexpr const char* kResolvConf =
     "# by hand\n"
@@ -216,40 +213,27 @@ bool theServerNeedsNoRootForIt() {
   return true;
 }
 
-TEST(ApplyCommands, ApplyIdempotentlyAndRevert) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnPrivateHost(isAppliedAndReverted));
-}
+TEST_F(ApplyCommands, ApplyIdempotentlyAndRevert) { EXPECT_TRUE(succeedsOnPrivateHost(isAppliedAndReverted)); }
 
-TEST(ApplyCommands, RefuseAndNameTheNextStep) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnPrivateHost(isRefusedWithTheNextStep));
-}
+TEST_F(ApplyCommands, RefuseAndNameTheNextStep) { EXPECT_TRUE(succeedsOnPrivateHost(isRefusedWithTheNextStep)); }
 
-TEST(ApplyCommands, TakeATrialBackUnlessItIsConfirmed) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnPrivateHost(areOnTrial));
-}
+TEST_F(ApplyCommands, TakeATrialBackUnlessItIsConfirmed) { EXPECT_TRUE(succeedsOnPrivateHost(areOnTrial)); }
 
-TEST(ApplyCommands, TakeATrialBackWhenTheProcessDies) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(ApplyCommands, TakeATrialBackWhenTheProcessDies) {
   for (const char* signal : {"KILL", "HUP", "TERM"}) {
     EXPECT_TRUE(succeedsOnPrivateHost([&] { return isTakenBackWhenTheProcessDies(signal); })) << signal;
   }
 }
 
-TEST(ApplyCommands, TakeATrialBackAtTheNextCallWhenAllProcessesDied) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(ApplyCommands, TakeATrialBackAtTheNextCallWhenAllProcessesDied) {
   EXPECT_TRUE(succeedsOnPrivateHost(isTakenBackLaterWhenBothDie));
 }
 
-TEST(ApplyToHost, BringsEachChangeToTheHostBeforeTheCommandEnds) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(ApplyToHost, BringsEachChangeToTheHostBeforeTheCommandEnds) {
   EXPECT_TRUE(succeedsOnPrivateHost(reachesTheHostAtOnce));
 }
 
-TEST(ApplyToHost, BringsAChangeToItsOwner) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(ApplyToHost, BringsAChangeToItsOwner) {
   EXPECT_TRUE(succeedsOnHostWithDaemons(
       [] { return reachesItsOwner("systemd-resolved", "resolvectl dns eth0 192.0.2.1", "resolvectl dns eth0"); }));
   EXPECT_TRUE(succeedsOnHostWithDaemons([] {
@@ -267,15 +251,11 @@ TEST(ApplyToHost, BringsAChangeToItsOwner) {
   }));
 }
 
-TEST(ApplyToHost, IsDoneByTheServerBeforeItAnswers) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
+TEST_F(ApplyToHost, IsDoneByTheServerBeforeItAnswers) {
   EXPECT_TRUE(succeedsOnPrivateHost(theServerAppliesBeforeItAnswers));
 }
 
-TEST(ApplyToHost, NeedsNoRootInTheServer) {
-  ZORVAGENT_NEEDS_PRIVATE_HOST();
-  EXPECT_TRUE(succeedsOnPrivateHost(theServerNeedsNoRootForIt));
-}
+TEST_F(ApplyToHost, NeedsNoRootInTheServer) { EXPECT_TRUE(succeedsOnPrivateHost(theServerNeedsNoRootForIt)); }
 
 }  // namespace
 }  // namespace zorva::cli
