@@ -38,7 +38,7 @@ Outcome outcomeOf(const std::string& busName, const FakeDaemon::Answer& answer) 
   DnsOwners owners("");
   owners.look(links);
   // A long answer may take longer than one look waits.
-  for (int turn = 0; turn < 500 && log.lines.size() == 1 && log.lines.front().starts_with("no answer"); ++turn) {
+  for (int turn = 0; turn < 3000 && log.lines.size() == 1 && log.lines.front().starts_with("no answer"); ++turn) {
     ::usleep(10000);
     owners.look(links);
   }
