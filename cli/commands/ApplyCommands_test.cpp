@@ -158,21 +158,93 @@ bool reachesTheHostAtOnce() {
   return true;
 }
 
-bool reachesItsOwner(const char* daemon, const char* prepare, const char* shows) {
-  prepareHost("host");
-  Daemons daemons;
-  daemons.start("systemd-resolved");
-  if (std::string(daemon) != "systemd-resolved") daemons.start(daemon);
-  outputOf(prepare);
-  EXPECT_TRUE(becomesTrue([] { return run("tree").find("192.0.2.1\n") != std::string::npos; }));
-  EXPECT_THAT(run("ifcfg init eth0"), EndsWith("[0]\n"));
+/// An owner of eth0's settings, which are the server 192.0.2.1.
+struct Owner {
+  const char* name;
+  const char* prepare;  ///< a command
+};
+constexpr Owner kOwners[] = {
+    {"systemd-resolved", "resolvectl dns eth0 192.0.2.1"},
+    {"systemd-networkd",
+     "printf '[Match]\\nName=eth0\\n[Network]\\nAddress=192.0.2.10/24\\nDNS=192.0.2.1\\n' > "
+     "/etc/systemd/network/10-lan.network; networkctl reload"},
+    {"NetworkManager",
+     "nmcli connection add type ethernet ifname eth0 con-name lan ipv4.method manual ipv4.addresses 192.0.2.10/24 "
+     "ipv4.dns 192.0.2.1 ipv6.method disabled; nmcli connection up lan"},
+};
+
+class OwnedHost {
+ public:
+  OwnedHost(const Owner& owner, const char* apply) : owner_(owner) {
+    prepareHost(apply);
+    daemons_.start("systemd-resolved");
+    if (owner_.name != std::string("systemd-resolved")) daemons_.start(owner_.name);
+    outputOf(owner_.prepare);
+    EXPECT_TRUE(becomesTrue([] { return run("tree").find("192.0.2.1\n") != std::string::npos; }));
+    EXPECT_THAT(run("ifcfg init eth0"), EndsWith("[0]\n"));
+  }
+
+  static std::string shown() { return outputOf("resolvectl dns eth0"); }
+  static bool hasOld() { return shown().ends_with(" 192.0.2.1\n"); }
+  static bool hasNew() { return shown().ends_with(" 192.0.2.53\n"); }
+  static bool isWhole() { return hasOld() || hasNew(); }
+  static bool appliesNow() { return run("apply eth0").ends_with("[0]\n") && hasNew(); }
+
+  void restartOwner() {
+    daemons_.stop(owner_.name);
+    daemons_.start(owner_.name);
+  }
+
+ private:
+  Owner owner_;
+  Daemons daemons_;
+};
+
+bool reachesItsOwner(const Owner& owner) {
+  const OwnedHost host(owner, "host");
   EXPECT_THAT(run("dns set eth0 192.0.2.53 192.0.2.54"),
-              AllOf(HasSubstr(std::string("eth0: applied by ") + daemon), EndsWith("[0]\n")));
-  EXPECT_THAT(outputOf(shows), HasSubstr("192.0.2.53 192.0.2.54"));
+              AllOf(HasSubstr(std::string("eth0: applied by ") + owner.name), EndsWith("[0]\n")));
+  EXPECT_THAT(host.shown(), HasSubstr("192.0.2.53 192.0.2.54"));
   EXPECT_THAT(run("apply"), StartsWith("eth0  the host has these settings already\n"));
   EXPECT_THAT(run("revert --all"), EndsWith("[0]\n"));
-  EXPECT_THAT(outputOf(shows), AllOf(HasSubstr("192.0.2.1"), Not(HasSubstr("192.0.2.53"))));
+  EXPECT_TRUE(host.hasOld()) << host.shown();
   return true;
+}
+
+bool isTriedAtItsOwner(const Owner& owner) {
+  const OwnedHost host(owner, "overlay");
+  EXPECT_THAT(run("dns set eth0 192.0.2.53"), EndsWith("[0]\n"));
+  EXPECT_THAT(run("apply --dry-run"), AllOf(HasSubstr("192.0.2.1  ->  192.0.2.53"), EndsWith("[0]\n")));
+  EXPECT_TRUE(host.hasOld()) << host.shown();
+  EXPECT_THAT(run("apply --confirm 1"), AllOf(HasSubstr("the settings were taken back"), EndsWith("[1]\n")));
+  EXPECT_TRUE(host.hasOld()) << host.shown();
+  return true;
+}
+
+/// The process at several points of its work, then the owner itself.
+bool survivesTheirDeath(const Owner& owner) {
+  OwnedHost host(owner, "overlay");
+  EXPECT_THAT(run("dns set eth0 192.0.2.53"), EndsWith("[0]\n"));
+  for (const char* delay : {"0.01", "0.03", "0.06", "0.12"}) {
+    outputOf(std::string("timeout --signal=KILL ") + delay + " " + kZorvactl + "apply eth0 </dev/null; true");
+    EXPECT_TRUE(becomesTrue(OwnedHost::isWhole)) << delay << ": " << host.shown();
+    EXPECT_TRUE(becomesTrue(OwnedHost::appliesNow)) << delay << ": " << host.shown();
+    EXPECT_THAT(run("revert eth0"), EndsWith("[0]\n")) << delay;
+    EXPECT_TRUE(host.hasOld()) << delay << ": " << host.shown();
+  }
+  outputOf(std::string(kZorvactl) + "apply eth0 </dev/null >/dev/null 2>&1 &");
+  ::usleep(30'000);
+  host.restartOwner();
+  EXPECT_TRUE(becomesTrue(OwnedHost::appliesNow)) << host.shown();
+  EXPECT_THAT(run("revert eth0"), EndsWith("[0]\n"));
+  EXPECT_TRUE(becomesTrue(OwnedHost::hasOld)) << host.shown();
+  return true;
+}
+
+void expectOfEachOwner(bool (*work)(const Owner& owner)) {
+  for (const Owner& owner : kOwners) {
+    EXPECT_TRUE(succeedsOnHostWithDaemons([&] { return work(owner); })) << owner.name;
+  }
 }
 
 constexpr const char* kServer = ZORVA_BIN_DIR
@@ -233,23 +305,11 @@ TEST_F(ApplyToHost, BringsEachChangeToTheHostBeforeTheCommandEnds) {
   EXPECT_TRUE(succeedsOnPrivateHost(reachesTheHostAtOnce));
 }
 
-TEST_F(ApplyToHost, BringsAChangeToItsOwner) {
-  EXPECT_TRUE(succeedsOnHostWithDaemons(
-      [] { return reachesItsOwner("systemd-resolved", "resolvectl dns eth0 192.0.2.1", "resolvectl dns eth0"); }));
-  EXPECT_TRUE(succeedsOnHostWithDaemons([] {
-    return reachesItsOwner("systemd-networkd",
-                           "printf '[Match]\\nName=eth0\\n[Network]\\nAddress=192.0.2.10/24\\nDNS=192.0.2.1\\n' > "
-                           "/etc/systemd/network/10-lan.network; networkctl reload",
-                           "resolvectl dns eth0");
-  }));
-  EXPECT_TRUE(succeedsOnHostWithDaemons([] {
-    return reachesItsOwner(
-        "NetworkManager",
-        "nmcli connection add type ethernet ifname eth0 con-name lan ipv4.method manual "
-        "ipv4.addresses 192.0.2.10/24 ipv4.dns 192.0.2.1 ipv6.method disabled; nmcli connection up lan",
-        "resolvectl dns eth0");
-  }));
-}
+TEST_F(ApplyToHost, BringsAChangeToItsOwner) { expectOfEachOwner(reachesItsOwner); }
+
+TEST_F(ApplyToHost, CanBeTriedAtEachOwner) { expectOfEachOwner(isTriedAtItsOwner); }
+
+TEST_F(ApplyToHost, LosesNothingWhenTheProcessOrTheOwnerDies) { expectOfEachOwner(survivesTheirDeath); }
 
 TEST_F(ApplyToHost, IsDoneByTheServerBeforeItAnswers) {
   EXPECT_TRUE(succeedsOnPrivateHost(theServerAppliesBeforeItAnswers));

@@ -14,7 +14,7 @@ namespace zorva::cli {
 struct CheckedServer {
   std::string server;                     ///< "192.0.2.1", "[2001:db8::1]:5353", or the text that is no address
   std::vector<std::string> usedBy;        ///< interfaces, "host" for the host's resolver, "systemd-resolved"
-  std::vector<std::string> neverAskedBy;  ///< of these, those that have it in vain
+  std::vector<std::string> neverAskedBy;  ///< of these, those that list it and do not ask it
   dns::Answer answer;
 
   bool isGood() const noexcept {
