@@ -57,7 +57,7 @@ std::uint32_t scopeOf(const std::string& zone) {
 std::string ServerAddress::text() const {
   char address[INET6_ADDRSTRLEN] = "";
   ::inet_ntop(family, &bytes, address, sizeof address);
-  const std::string whole = address + (zone.empty() ? std::string() : "%" + zone);
+  std::string whole = address + (zone.empty() ? std::string() : "%" + zone);
   if (port == kUsualPort) return whole;
   return (family == AF_INET6 ? "[" + whole + "]" : whole) + ":" + std::to_string(port);
 }

@@ -43,9 +43,8 @@ Condition* conditionOf(void* handle) noexcept { return checked<Condition>(handle
 
 // A pthread_t is a number; as a handle it is that number as a pointer.
 static_assert(sizeof(pthread_t) == sizeof(void*));
-void* handleOf(pthread_t thread) noexcept {
-  return reinterpret_cast<void*>(thread);
-}  // NOLINT(performance-no-int-to-ptr)
+// NOLINTNEXTLINE(performance-no-int-to-ptr)
+void* handleOf(pthread_t thread) noexcept { return reinterpret_cast<void*>(thread); }
 pthread_t threadOf(void* handle) noexcept { return reinterpret_cast<pthread_t>(handle); }
 
 // The file name of a library on this system; the caller frees the text. A path, or a name that is a file name already,
