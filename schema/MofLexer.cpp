@@ -119,7 +119,7 @@ void MofLexer::advance() {
   const char c = text_[at_];
   if (isLetter(c) || isBeyondAscii(c) || c == '$') {
     readWord();
-  } else if (std::memchr("{}[](),;:=", c, 10) != nullptr) {
+  } else if (std::string_view("{}[](),;:=").find(c) != std::string_view::npos) {
     token_.kind = TokenKind::Mark;
     token_.lexeme = text_.substr(at_++, 1);
   } else if (c == '"') {

@@ -42,7 +42,7 @@ void readListen(Config& config, const util::TomlDocument& document) {
 
 void readLimits(Config& config, const util::TomlDocument& document) {
   constexpr std::size_t kKibibyte = 1024;
-  constexpr std::size_t kMebibyte = 1024 * 1024;
+  constexpr std::size_t kMebibyte = kKibibyte * 1024;
   http::HttpLimits& limits = config.limits;
   util::TomlTable table(document, "limits");
   takeSize(table, "body_kib", limits.bodyBytes, 1, 1024 * 1024, kKibibyte);
