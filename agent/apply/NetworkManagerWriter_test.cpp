@@ -144,7 +144,7 @@ TEST_F(NetworkManagerWriter, AChangeIsOnDisk) { EXPECT_TRUE(succeedsOnHostWithDa
 // NetworkManager gives no password to those who ask for a profile. Any connection may have these settings.
 bool aPasswordStays() {
   std::string profile = kLan + std::string("[pppoe]\nusername=me\npassword=a secret\n");
-  // Version 1.42 loses the password beside these settings, whoever changes the profile.
+  // NetworkManager 1.42 drops the password of such a profile at any change, by nmcli too.
   const std::string ethtool = "[ethtool]\nfeature-gro=true\n";
   profile.erase(profile.find(ethtool), ethtool.size());
   Host host(profile);
