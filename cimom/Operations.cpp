@@ -57,6 +57,24 @@ Status checkParameterNames(const cimxml::Call& call) {
           call.name + ": the parameter " + broker::quotedText(name.substr(0, 80)) + " is there twice"};
 }
 
+/// The role that an operation needs. What a method changes is not known here.
+access::Role roleFor(const cimxml::Call& call) noexcept {
+  constexpr std::string_view kChanges[] = {"ModifyInstance", "SetProperty", "CreateInstance", "DeleteInstance"};
+  const bool changes = call.isExtrinsic || std::any_of(std::begin(kChanges), std::end(kChanges),
+                                                       [&](auto each) { return util::sameName(each, call.name); });
+  return changes ? access::Role::Operate : access::Role::Read;
+}
+
+Status checkRole(const Operation& operation) {
+  if (operation.who == nullptr) return {};
+  const access::Role has = operation.who->grants.in(operation.nameSpace);
+  if (has >= roleFor(operation.call)) return {};
+  const std::string who = operation.who->user.empty() ? "a client without a login" : operation.who->user;
+  return {
+      CMPI_RC_ERR_ACCESS_DENIED,
+      who + (has == access::Role::None ? " may not use the namespace " : " may only read in ") + operation.nameSpace};
+}
+
 /// Replaces CMPI codes that CIM lacks.
 Status asCim(Status status) {
   constexpr int kLastOfCim = 29;
@@ -76,7 +94,8 @@ Status carryOut(Operation& operation) {
     return {CMPI_RC_ERR_INVALID_NAMESPACE,
             "there is no namespace " + broker::quotedText(call.target.nameSpace.substr(0, 200))};
   }
-  Status status = checkParameterNames(call);
+  Status status = checkRole(operation);
+  if (status.ok()) status = checkParameterNames(call);
   return asCim(status.ok() ? function(operation) : std::move(status));
 }
 

@@ -9,6 +9,7 @@
 #include <string_view>
 #include <vector>
 
+#include "access/Role.h"
 #include "broker/Broker.h"
 #include "cimom/Pull.h"
 #include "cimom/ServiceHost.h"
@@ -25,9 +26,10 @@ struct Operation {
   const broker::Caller& caller;
   const cimxml::Call& call;
   cimxml::ResponseWriter& writer;
-  const std::string& client;    ///< http::HttpRequest::client
-  std::string_view hostHeader;  ///< as the client named this host
-  std::string nameSpace;        ///< as the registry spells it
+  const std::string& client;     ///< http::HttpRequest::client
+  const access::ClientPtr& who;  ///< null: everything is allowed
+  std::string_view hostHeader;   ///< as the client named this host
+  std::string nameSpace;         ///< as the registry spells it
   /// Takes the rest of a line that says what the client changed.
   std::function<void(const std::string& what)> noteChange;
 

@@ -215,8 +215,9 @@ class ServiceCore {
     for (const cimxml::Call& call : request.calls) {
       writer.beginResponse(call.name, call.isExtrinsic);
       const auto note = [&](const std::string& what) { noteChange(whoIs(client.http) + " " + what); };
-      Operation operation{broker_, pulls_, host_, client.caller, call, writer, client.http.client, client.headers.host,
-                          {},      note};
+      Operation operation{
+          broker_, pulls_, host_, client.caller, call, writer, client.http.client, client.http.who, client.headers.host,
+          {},      note};
       const Status status = carryOutSafely(operation);
       if (!status.ok()) {
         const std::string text(broker::statusName(status.rc));

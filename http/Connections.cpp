@@ -49,8 +49,8 @@ bool hasHungUp(int socket) {
 
 }  // namespace
 
-Connection::Connection(int socket, std::string peer, std::string client)
-    : peer_(std::move(peer)), client_(std::move(client)), state_(0), socket_(socket) {
+Connection::Connection(int socket, std::string peer, std::string client, access::Origin origin)
+    : peer_(std::move(peer)), client_(std::move(client)), origin_(std::move(origin)), state_(0), socket_(socket) {
   enter(Phase::Arriving);
 }
 

@@ -12,6 +12,7 @@
 #include <string>
 #include <vector>
 
+#include "access/Origin.h"
 #include "http/HttpLimits.h"
 
 namespace zorva::http {
@@ -26,12 +27,14 @@ enum class Phase : std::uint8_t {
 /// One connection. `socket` belongs to the HTTP library, which closes it; here it is only shut down.
 class Connection {
  public:
-  Connection(int socket, std::string peer, std::string client);
+  Connection(int socket, std::string peer, std::string client, access::Origin origin = {});
 
   const std::string& peer() const noexcept { return peer_; }
 
   /// The client of the connection: see clientOf().
   const std::string& client() const noexcept { return client_; }
+
+  const access::Origin& origin() const noexcept { return origin_; }
 
   /// Enters a phase, or notes that something happened in it. A phase and its time are always read together.
   void enter(Phase phase) noexcept;
@@ -51,6 +54,7 @@ class Connection {
   friend class Connections;
   const std::string peer_;
   const std::string client_;
+  const access::Origin origin_;
   std::atomic<std::uint64_t> state_;  ///< milliseconds of the steady clock, times four, and the phase
   std::atomic<bool> proven_ = false;
   std::atomic<std::size_t> held_ = 0;

@@ -11,6 +11,8 @@
 #include <utility>
 #include <vector>
 
+#include "access/Role.h"
+
 namespace zorva::http {
 
 /// HTTP header fields in the order in which they came; names in any case.
@@ -25,6 +27,7 @@ struct HttpRequest {
   bool takesTrailers = false;  ///< the client said TE: trailers
   std::string client = {};     ///< the client, for limits per client
   std::string peer = {};       ///< the client's address and port
+  access::ClientPtr who = {};  ///< who it is and what it may do; null: nobody asked
 };
 
 /// Thrown by ResponseSink::write if the client has closed the connection: nothing reads the rest.

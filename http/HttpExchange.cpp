@@ -329,6 +329,7 @@ HeaderList headersOf(const Refusal& refusal) {
   HeaderList headers{{MHD_HTTP_HEADER_CONTENT_TYPE, "text/plain; charset=utf-8"}};
   if (!refusal.cimError.empty()) headers.emplace_back("CIMError", refusal.cimError);
   if (!refusal.allow.empty()) headers.emplace_back(MHD_HTTP_HEADER_ALLOW, refusal.allow);
+  if (!refusal.login.empty()) headers.emplace_back(MHD_HTTP_HEADER_WWW_AUTHENTICATE, refusal.login);
   if (refusal.status == 503) headers.emplace_back(MHD_HTTP_HEADER_RETRY_AFTER, "1");
   return headers;
 }

@@ -28,6 +28,8 @@ namespace zorva::http {
 
 namespace {
 
+constexpr std::string_view kLogin = "Basic realm=\"zorvacimd\", charset=\"UTF-8\"";
+
 /// What the HTTP library stores for a request.
 using Holder = std::shared_ptr<HttpExchange>;
 
@@ -45,7 +47,7 @@ std::string withoutLineEnd(std::string text) {
 
 class HttpServer::Core {
  public:
-  Core(const HttpLimits& limits, int threads, Handler handler, std::string page);
+  Core(const HttpLimits& limits, int threads, Handler handler, std::string page, std::shared_ptr<access::Gate> gate);
   ~Core();
 
   void take(int socket, const sockaddr_storage& peer, socklen_t peerSize);
@@ -68,6 +70,7 @@ class HttpServer::Core {
   static void onLog(void* core, const char* format, va_list arguments);
 
   MHD_Result readHead(Holder& exchange, MHD_Connection* connection, const char* method, const char* version);
+  std::optional<Refusal> admit(HttpExchange& exchange);
   void readBody(HttpExchange& exchange, std::string_view data);
   void releaseBody(HttpExchange& exchange);
   bool answersAtOnce(HttpExchange& exchange) const;
@@ -80,6 +83,7 @@ class HttpServer::Core {
   mutable std::mutex limitsMutex_;
   HttpLimits limits_;
   const std::string page_;
+  const std::shared_ptr<access::Gate> gate_;
   Connections connections_;
   Workers workers_;
   std::atomic<std::size_t> bodies_ = 0;  ///< bytes of unfinished requests
@@ -87,9 +91,11 @@ class HttpServer::Core {
   MHD_Daemon* daemon_ = nullptr;
 };
 
-HttpServer::Core::Core(const HttpLimits& limits, int threads, Handler handler, std::string page)
+HttpServer::Core::Core(const HttpLimits& limits, int threads, Handler handler, std::string page,
+                       std::shared_ptr<access::Gate> gate)
     : limits_(limits),
       page_(std::move(page)),
+      gate_(std::move(gate)),
       workers_(limits, [work = std::move(handler)](HttpExchange& exchange) { work(exchange.request, exchange); }) {
   startDaemon(threads);
 }
@@ -226,7 +232,9 @@ MHD_Result HttpServer::Core::readHead(Holder& exchange, MHD_Connection* connecti
   exchange->isHttp11 = std::strcmp(version, "HTTP/1.1") == 0;
 
   const HttpLimits now = limits();
-  if (auto refusal = checkHead({request.method, request.path, version, request.headers}, now.bodyBytes)) {
+  auto refusal = checkHead({request.method, request.path, version, request.headers}, now.bodyBytes);
+  if (!refusal) refusal = admit(*exchange);
+  if (refusal) {
     logRefusal(*exchange, *refusal);
     exchange->client->enter(Phase::Sending);
     return respondWith(connection, *refusal);
@@ -234,6 +242,25 @@ MHD_Result HttpServer::Core::readHead(Holder& exchange, MHD_Connection* connecti
   exchange->takesGzip = now.gzip && listHas(request.headers, "Accept-Encoding", "gzip");
   request.takesTrailers = exchange->isHttp11 && listHas(request.headers, "TE", "trailers");
   return MHD_YES;
+}
+
+/// Finds out who the client is. The page for people is shown to everybody.
+std::optional<Refusal> HttpServer::Core::admit(HttpExchange& exchange) {
+  HttpRequest& request = exchange.request;
+  if (asksForPage(request.method, request.path)) return std::nullopt;
+  access::Decision decision =
+      gate_->decide(exchange.client->origin(), findHeader(request.headers, MHD_HTTP_HEADER_AUTHORIZATION));
+  switch (decision.kind) {
+    case access::Decision::Kind::Admitted:
+      request.who = std::move(decision.client);
+      return std::nullopt;
+    case access::Decision::Kind::NeedsLogin:
+      return Refusal{401, std::move(decision.why), {}, {}, kLogin};
+    case access::Decision::Kind::MustVerify:
+    case access::Decision::Kind::Refused:
+      break;
+  }
+  return Refusal{403, std::move(decision.why), {}};
 }
 
 void HttpServer::Core::readBody(HttpExchange& exchange, std::string_view data) {
@@ -325,8 +352,9 @@ void HttpServer::Core::onLog(void*, const char* format, va_list arguments) {
 
 // ---- HttpServer ----
 
-HttpServer::HttpServer(const HttpLimits& limits, int threads, Handler handler, std::string page)
-    : core_(std::make_unique<Core>(limits, threads, std::move(handler), std::move(page))) {}
+HttpServer::HttpServer(const HttpLimits& limits, int threads, Handler handler, std::string page,
+                       std::shared_ptr<access::Gate> gate)
+    : core_(std::make_unique<Core>(limits, threads, std::move(handler), std::move(page), std::move(gate))) {}
 
 HttpServer::~HttpServer() = default;
 

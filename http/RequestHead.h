@@ -26,6 +26,7 @@ struct Refusal {
   std::string why;            ///< a sentence for the client's user and for the log
   std::string_view cimError;  ///< value of the header CIMError (DSP0200 7.3.3); empty: none
   std::string_view allow{};   ///< value of the header Allow; empty: none
+  std::string_view login{};   ///< value of the header WWW-Authenticate; empty: none
 };
 
 /// Whether the request may go on to its body. Requests that are answered without a body may: OPTIONS, and GET and HEAD
