@@ -185,7 +185,7 @@ Status Broker::modifyInstance(const Instance& instance, const std::optional<std:
     if (!status.ok()) return status;
     Shape shape;
     shape.properties = viewsOf(propertyList);
-    status = request.modify(*name, *object, shape, effect != nullptr ? &effect->changes : nullptr);
+    status = request.modify(*name, *object, shape, effect);
     if (status.ok() && effect != nullptr && !effect->changes.empty()) {
       OneTaker taker(&effect->now, nullptr);
       effect->reading = request.get(*name, Shape(), taker);

@@ -5,6 +5,7 @@
 #include <algorithm>
 
 #include "broker/objects/PathText.h"
+#include "cimom/OperationsArguments.h"
 #include "cimxml/ElementWriter.h"
 #include "util/Utf8.h"
 
@@ -57,18 +58,30 @@ Status checkParameterNames(const cimxml::Call& call) {
           call.name + ": the parameter " + broker::quotedText(name.substr(0, 80)) + " is there twice"};
 }
 
-/// The role that an operation needs. What a method changes is not known here.
-access::Role roleFor(const cimxml::Call& call) noexcept {
+bool changesSomething(const cimxml::Call& call) noexcept {
   constexpr std::string_view kChanges[] = {"ModifyInstance", "SetProperty", "CreateInstance", "DeleteInstance"};
-  const bool changes = call.isExtrinsic || std::any_of(std::begin(kChanges), std::end(kChanges),
-                                                       [&](auto each) { return util::sameName(each, call.name); });
-  return changes ? access::Role::Operate : access::Role::Read;
+  return call.isExtrinsic || std::any_of(std::begin(kChanges), std::end(kChanges),
+                                         [&](auto each) { return util::sameName(each, call.name); });
+}
+
+/// The object that a refused operation names, as far as it can be read.
+broker::ObjectPath objectOf(const cimxml::Call& call) {
+  Arguments arguments(call);
+  if (call.isExtrinsic) return call.target;
+  if (util::sameName(call.name, "ModifyInstance")) return arguments.requiredInstance("ModifiedInstance").path;
+  if (util::sameName(call.name, "CreateInstance")) return arguments.requiredInstance("NewInstance").path;
+  return arguments.requiredPath("InstanceName");
 }
 
 Status checkRole(const Operation& operation) {
   if (operation.who == nullptr) return {};
   const access::Role has = operation.who->grants.in(operation.nameSpace);
-  if (has >= roleFor(operation.call)) return {};
+  // What a method changes is not known here.
+  if (has >= (changesSomething(operation.call) ? access::Role::Operate : access::Role::Read)) return {};
+  broker::ObjectPath object;
+  if (changesSomething(operation.call)) object = objectOf(operation.call);
+  object.nameSpace = operation.nameSpace;
+  noteObject(operation, object);
   const std::string who = operation.who->user.empty() ? "a client without a login" : operation.who->user;
   return {
       CMPI_RC_ERR_ACCESS_DENIED,
@@ -99,13 +112,8 @@ Status carryOut(Operation& operation) {
   return asCim(status.ok() ? function(operation) : std::move(status));
 }
 
-void noteChange(const Operation& operation, std::string_view what, const broker::ObjectPath& path,
-                const std::vector<std::string>& names) {
-  constexpr std::size_t kLongestPath = 1000;
-  const std::string text = broker::pathText(path);
-  std::string line = std::string(what) + " " + text.substr(0, util::utf8Cut(text, kLongestPath));
-  for (const std::string& name : names) line += (&name == names.data() ? ": " : ", ") + name;
-  operation.noteChange(line);
+void noteObject(const Operation& operation, const broker::ObjectPath& path) {
+  operation.record.object = broker::pathText(path);
 }
 
 void canonicalizeValue(const Operation& operation, broker::Value& value) {
@@ -205,18 +213,23 @@ Status checkSaidTypes(const Operation& operation) {
   return {};
 }
 
-/// The effect of a method is not known here: a successful call counts as a change, except for the one method that is
-/// known to read only.
-void noteCall(const Operation& operation, const broker::ObjectPath& path, const broker::MethodResult& result) {
-  const broker::Scalar& value = result.returnValue.scalar;
-  const bool isDone = result.returnValue.isNull || value == broker::Scalar(std::uint64_t{0}) ||
-                      value == broker::Scalar(std::int64_t{0});
-  const schema::Class* declared = operation.classes().find(path.className);
-  const schema::ClassMethod* method = declared != nullptr ? declared->findMethod(operation.call.name) : nullptr;
-  if (!isDone || method == nullptr || method->name == "GetCentralInstances") return;
-  std::vector<std::string> names;
-  for (const broker::NamedValue& argument : operation.call.input) names.push_back(argument.name);
-  noteChange(operation, "called " + method->name + " of", path, names);
+/// What a method changes is not known here, so each call is noted, except for the one method that is known to read
+/// only.
+void noteCall(const Operation& operation, const broker::ObjectPath& path) {
+  if (util::sameName(operation.call.name, "GetCentralInstances")) return;
+  noteObject(operation, path);
+  for (const broker::NamedValue& argument : operation.call.input) {
+    operation.record.changes.push_back({argument.name, {}, broker::literalText(argument.value)});
+  }
+}
+
+/// By custom, a method that returns another number than 0 did not do its work.
+void noteReturned(const Operation& operation, const broker::Value& value) {
+  if (value.isNull || value.scalar == broker::Scalar(std::uint64_t{0}) ||
+      value.scalar == broker::Scalar(std::int64_t{0})) {
+    return;
+  }
+  operation.record.result = "returned " + broker::literalText(value);
 }
 
 }  // namespace
@@ -226,11 +239,12 @@ Status invokeMethod(Operation& operation) {
   Status status = checkSaidTypes(operation);
   if (status.ok()) status = canonicalizePath(operation, path);
   if (!status.ok()) return status;
+  noteCall(operation, path);
   std::vector<broker::NamedValue> input = operation.call.input;
   for (broker::NamedValue& argument : input) canonicalizeValue(operation, argument.value);
   const auto result = operation.broker.invokeMethod(path, operation.call.name, input, operation.caller);
   if (!result) return result.error();
-  noteCall(operation, path, *result);
+  noteReturned(operation, result->returnValue);
   std::string& out = operation.writer.out();
   if (!result->returnValue.isNull) cimxml::appendReturnValue(out, result->returnValue);
   for (const broker::NamedValue& value : result->output) {

@@ -9,6 +9,7 @@
 #include <string_view>
 #include <vector>
 
+#include "access/Audit.h"
 #include "access/Role.h"
 #include "broker/Broker.h"
 #include "cimom/Pull.h"
@@ -30,8 +31,7 @@ struct Operation {
   const access::ClientPtr& who;  ///< null: everything is allowed
   std::string_view hostHeader;   ///< as the client named this host
   std::string nameSpace;         ///< as the registry spells it
-  /// Takes the rest of a line that says what the client changed.
-  std::function<void(const std::string& what)> noteChange;
+  access::AuditRecord& record;   ///< filled by an operation that changes something, or would
 
   const schema::ClassRepository& classes() const { return broker.classes(); }
 };
@@ -58,9 +58,8 @@ broker::Status canonicalizePath(const Operation& operation, broker::ObjectPath& 
 /// The same for the references in a value.
 void canonicalizeValue(const Operation& operation, broker::Value& value);
 
-/// Logs a change that succeeded: the action, the object, and the names of the given properties or parameters.
-void noteChange(const Operation& operation, std::string_view what, const broker::ObjectPath& path,
-                const std::vector<std::string>& names = {});
+/// Notes which object the operation changes, or tries to.
+void noteObject(const Operation& operation, const broker::ObjectPath& path);
 
 /// Carries the writer's exceptions past a provider, which must not see them: write in put(), then call finish().
 class Stream {

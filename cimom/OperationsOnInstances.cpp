@@ -3,6 +3,7 @@
 
 #include <cmpidt.h>
 
+#include "broker/objects/PathText.h"
 #include "cimom/Operations.h"
 #include "cimom/OperationsArguments.h"
 #include "cimom/OperationsSelection.h"
@@ -85,9 +86,10 @@ Status createInstance(Operation& operation) {
   if (!status.ok()) return status;
   instance.path.nameSpace = operation.nameSpace;
   canonicalizeProperties(operation, instance);
+  noteObject(operation, instance.path);
   const auto created = operation.broker.createInstance(instance, operation.caller);
   if (!created) return created.error();
-  noteChange(operation, "created", *created);
+  noteObject(operation, *created);
   operation.writer.beginReturnValue();
   cimxml::appendInstanceName(operation.writer.out(), *created);
   operation.writer.endReturnValue();
@@ -96,12 +98,14 @@ Status createInstance(Operation& operation) {
 
 Status modifyAndNote(const Operation& operation, const Instance& instance,
                      const std::optional<std::vector<std::string>>& propertyList) {
-  std::vector<broker::Property> changed;
-  Status status = frontend::modifyInstance(operation.broker, instance, propertyList, operation.caller, &changed);
+  broker::ModificationEffect effect;
+  Status status = frontend::modifyInstance(operation.broker, instance, propertyList, operation.caller, &effect);
+  for (std::size_t i = 0; i < effect.changes.size(); ++i) {
+    operation.record.changes.push_back(
+        {effect.changes[i].name, broker::literalText(effect.before[i]), broker::literalText(effect.changes[i].value)});
+  }
+  if (!status.ok() || !effect.changes.empty()) noteObject(operation, instance.path);
   if (!status.ok()) return status;
-  std::vector<std::string> names;
-  for (const broker::Property& property : changed) names.push_back(property.name);
-  if (!names.empty()) noteChange(operation, "changed", instance.path, names);
   // Also where nothing changed: a client repeats a change that did not reach the host.
   return frontend::applyToHost(instance.path, frontend::SettingsLockIs::Free).status;
 }
@@ -123,9 +127,8 @@ Status deleteInstance(Operation& operation) {
   ObjectPath path = arguments.requiredPath("InstanceName");
   Status status = arguments.status();
   if (status.ok()) status = canonicalizePath(operation, path);
-  if (status.ok()) status = operation.broker.deleteInstance(path, operation.caller);
-  if (status.ok()) noteChange(operation, "deleted", path);
-  return status;
+  noteObject(operation, path);
+  return status.ok() ? operation.broker.deleteInstance(path, operation.caller) : status;
 }
 
 /// The property that an operation names.

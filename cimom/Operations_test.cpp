@@ -416,31 +416,43 @@ TEST_F(OperationsTest, AChangeLeavesALineThatSaysWhoChangedWhat) {
   ask("SetProperty", parameter("InstanceName", thing("a")) + text("PropertyName", "size") + text("NewValue", "12"));
   invoke("Call", thing("a"), "<PARAMVALUE NAME=\"Text\"><VALUE>x</VALUE></PARAMVALUE>");
   ask("DeleteInstance", parameter("InstanceName", thing("a")));
+  const std::string begin = "user=\"\" login=none from=\"192.0.2.1:4711 (user 7)\" operation=";
+  const std::string object = " object=\"root/cimv2:T_Thing.Name=\\\"a\\\"\" ";
   EXPECT_THAT(service_.changes(),
-              ::testing::ElementsAre("192.0.2.1:4711 (user 7) changed root/cimv2:T_Thing.Name=\"a\": Size, Labels",
-                                     "192.0.2.1:4711 (user 7) changed root/cimv2:T_Thing.Name=\"a\": Size",
-                                     "192.0.2.1:4711 (user 7) called Call of root/cimv2:T_Thing.Name=\"a\": Text",
-                                     "192.0.2.1:4711 (user 7) deleted root/cimv2:T_Thing.Name=\"a\""));
+              ::testing::ElementsAre(begin + "ModifyInstance" + object + "change=\"Size: 7 -> 9\" change=\"Labels: " +
+                                         R"({\"x\", \"y\"} -> {\"z\"}" result="done")",
+                                     begin + "SetProperty" + object + "change=\"Size: 9 -> 12\" result=\"done\"",
+                                     begin + "Call" + object + R"(change="Text: \"x\"" result="done")",
+                                     begin + "DeleteInstance" + object + "result=\"done\""));
 }
 
-TEST_F(OperationsTest, WhatFailsOrReadsLeavesNoLineOfAChange) {
+TEST_F(OperationsTest, AChangeThatFailsLeavesALineWithTheReason) {
   errorOf("SetProperty", parameter("InstanceName", thing("a")) + text("PropertyName", "Size") + text("NewValue", "x"));
   errorOf("DeleteInstance", parameter("InstanceName", thing("b")));
   invoke("Echo", thing("a"), "<PARAMVALUE NAME=\"Times\"><VALUE>3</VALUE></PARAMVALUE>");  // it returns 3
+  EXPECT_THAT(service_.changes(),
+              ::testing::ElementsAre(HasSubstr("operation=SetProperty object=\"root/cimv2:T_Thing.Name=\\\"a\\\"\" "
+                                               "result=\"CIM_ERR_TYPE_MISMATCH: "),
+                                     HasSubstr("result=\"CIM_ERR_NOT_FOUND: "), HasSubstr("result=\"returned 3\"")));
+}
+
+TEST_F(OperationsTest, WhatReadsLeavesNoLine) {
   ask("EnumerateInstances", className("ClassName", "T_Thing"));
+  ask("GetInstance", parameter("InstanceName", thing("b")));
   EXPECT_THAT(service_.changes(), ::testing::IsEmpty());
 }
 
 TEST_F(OperationsTest, AClientWritesNoLinesOfItsOwnIntoTheLineOfAChange) {
   const http::HttpRequest asked =
-      testing::post(testing::message(testing::extrinsic("Call", thing("x&#10;2026 forged&#127;"),
+      testing::post(testing::message(testing::extrinsic("Call", thing("x&#10;2026 forged&#127;\" result=\"done"),
                                                         "<PARAMVALUE NAME=\"Text\"><VALUE>x</VALUE></PARAMVALUE>")),
                     {{"CIMOperation", "MethodCall"},
                      {"CIMMethod", "Call"},
-                     {"CIMObject", "root/cimv2:T_Thing.Name=\"x%0A2026 forged%7F\""}});
+                     {"CIMObject", "root/cimv2:T_Thing.Name=\"x%0A2026 forged%7F\\\" result=\\\"done\""}});
   EXPECT_EQ(service_.ask(asked).status, 200);
-  EXPECT_THAT(service_.changes(), ::testing::ElementsAre("192.0.2.1:4711 (user 7) called Call of "
-                                                         "root/cimv2:T_Thing.Name=\"x\\n2026 forged?\": Text"));
+  ASSERT_THAT(service_.changes(), ::testing::SizeIs(1));
+  EXPECT_THAT(service_.changes().front(),
+              HasSubstr(R"(object="root/cimv2:T_Thing.Name=\"x\\n2026 forged\x7f\\\" result=)"));
 }
 
 // Errors.

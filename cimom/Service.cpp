@@ -130,6 +130,23 @@ std::string whoIs(const http::HttpRequest& http) {
   return http.client.empty() ? http.peer : http.peer + " (" + http.client + ")";
 }
 
+access::AuditRecord recordFor(const http::HttpRequest& http, const cimxml::Call& call) {
+  access::AuditRecord record;
+  if (http.who != nullptr) {
+    record.user = http.who->user;
+    record.proof = http.who->proof;
+  }
+  record.from = whoIs(http);
+  record.operation = call.name;
+  record.result = "done";
+  return record;
+}
+
+std::string statusText(const Status& status) {
+  const std::string name(broker::statusName(status.rc));
+  return (name.empty() ? std::to_string(status.rc) : name) + ": " + status.message;
+}
+
 /// The buffer in which this thread's responses are gathered, reused for each request.
 class Buffer : util::NotCopied {
  public:
@@ -214,15 +231,15 @@ class ServiceCore {
     writer.beginMessage(request.id, request.isMultiple);
     for (const cimxml::Call& call : request.calls) {
       writer.beginResponse(call.name, call.isExtrinsic);
-      const auto note = [&](const std::string& what) { noteChange(whoIs(client.http) + " " + what); };
+      access::AuditRecord record = recordFor(client.http, call);
       Operation operation{
           broker_, pulls_, host_, client.caller, call, writer, client.http.client, client.http.who, client.headers.host,
-          {},      note};
+          {},      record};
       const Status status = carryOutSafely(operation);
+      audit(std::move(record), status);
       if (!status.ok()) {
-        const std::string text(broker::statusName(status.rc));
-        log(LogLevel::Info, call.name + " in " + broker::quotedText(call.target.nameSpace.substr(0, 200)) + ": " +
-                                (text.empty() ? std::to_string(status.rc) : text) + ": " + status.message);
+        log(LogLevel::Info,
+            call.name + " in " + broker::quotedText(call.target.nameSpace.substr(0, 200)) + ": " + statusText(status));
         const auto code = static_cast<std::uint32_t>(status.rc);
         if (!writer.putError(code, status.message)) return sink.fail(code, status.message);
       }
@@ -231,8 +248,11 @@ class ServiceCore {
     writer.endMessage();
   }
 
-  void noteChange(const std::string& line) const noexcept try {
-    if (options_.changes) options_.changes(withoutControls(line));
+  /// An operation that only reads, or changed nothing, leaves its record without an object.
+  void audit(access::AuditRecord record, const Status& status) const noexcept try {
+    if (record.object.empty() || !options_.audit) return;
+    if (!status.ok()) record.result = statusText(status);
+    options_.audit(std::move(record));
   } catch (...) {
     // A log that fails must not fail the request.
   }

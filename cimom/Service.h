@@ -11,6 +11,7 @@
 #include <string>
 #include <string_view>
 
+#include "access/Audit.h"
 #include "broker/Broker.h"
 #include "http/Exchange.h"
 #include "util/NotCopied.h"
@@ -22,8 +23,8 @@ struct ServiceOptions {
   std::string hostName;
   /// Takes log lines; may be empty. Called on any thread.
   broker::LogHook log;
-  /// Takes a line for each change: the client, the object, and what was changed. May be empty. Called on any thread.
-  std::function<void(const std::string& line)> changes;
+  /// Takes a record of each change, done or not, and of each refusal. May be empty.
+  access::AuditHook audit;
 
   std::size_t maxDepth = 128;       ///< the deepest nesting of elements in a request
   std::size_t maxOperations = 100;  ///< the most operations in one multiple request

@@ -44,11 +44,11 @@ broker::Status checkEffect(const broker::ModificationEffect& effect) {
 
 broker::Status modifyInstance(broker::Broker& broker, const broker::Instance& instance,
                               const std::optional<std::vector<std::string>>& propertyList, const broker::Caller& caller,
-                              std::vector<broker::Property>* changed) {
-  broker::ModificationEffect effect;
-  broker::Status status = broker.modifyInstance(instance, propertyList, caller, &effect);
-  if (status.ok() && !effect.changes.empty()) status = checkEffect(effect);
-  if (changed != nullptr) *changed = std::move(effect.changes);
+                              broker::ModificationEffect* effect) {
+  broker::ModificationEffect own;
+  broker::ModificationEffect& made = effect != nullptr ? *effect : own;
+  broker::Status status = broker.modifyInstance(instance, propertyList, caller, &made);
+  if (status.ok() && !made.changes.empty()) status = checkEffect(made);
   return status;
 }
 

@@ -32,9 +32,9 @@ broker::Status checkChanges(const broker::Instance& now, const std::vector<broke
 std::string reasonOnThisHost(const broker::Instance& now, const broker::Property& change);
 
 /// Broker::modifyInstance, then a check that the changes were stored. A failure of the provider itself is returned
-/// unchanged. `changed`, if not null, gets the changed properties; none if all had the requested values already.
+/// unchanged. `effect`, if not null, gets the changed properties; none if all had the requested values already.
 broker::Status modifyInstance(broker::Broker& broker, const broker::Instance& instance,
                               const std::optional<std::vector<std::string>>& propertyList,
-                              const broker::Caller& caller = {}, std::vector<broker::Property>* changed = nullptr);
+                              const broker::Caller& caller = {}, broker::ModificationEffect* effect = nullptr);
 
 }  // namespace zorva::frontend

@@ -1,5 +1,7 @@
 #include "server/BrokerLog.h"
 
+#include <string>
+
 #include "http/Log.h"
 
 namespace zorva::server {
@@ -14,10 +16,6 @@ void logServiceLine(broker::LogLevel level, std::string_view text) noexcept try 
   http::logClientLine(levelOf(level), std::string(text), "service", __FILE__, __LINE__);
 } catch (...) {
   // The line is lost, like any line that cannot be written.
-}
-
-void logChange(const std::string& line) noexcept {
-  http::logLine(http::Level::Change, line, "service", __FILE__, __LINE__);
 }
 
 void logBrokerLine(broker::LogLevel level, std::string_view text) noexcept try {

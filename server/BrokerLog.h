@@ -2,7 +2,6 @@
 
 // Writes the lines of the broker and of the CIM operations to the server's log. Thread-safe; nothing here throws.
 
-#include <string>
 #include <string_view>
 
 #include "broker/Broker.h"
@@ -14,8 +13,5 @@ void logBrokerLine(broker::LogLevel level, std::string_view text) noexcept;
 
 /// Takes the lines about requests. Clients can cause them, so their rate is limited.
 void logServiceLine(broker::LogLevel level, std::string_view text) noexcept;
-
-/// Takes a line about a client's change. None of them is dropped.
-void logChange(const std::string& line) noexcept;
 
 }  // namespace zorva::server

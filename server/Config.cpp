@@ -89,6 +89,13 @@ void readAgent(Config& config, const util::TomlDocument& document) {
   config.providerDirectory = util::pathFrom(config.file, config.providerDirectory);
 }
 
+void readAudit(Config& config, const util::TomlDocument& document) {
+  util::TomlTable audit(document, "audit");
+  audit.take("file", config.auditFile);
+  audit.finish();
+  config.auditFile = util::pathFrom(config.file, config.auditFile);
+}
+
 void readLog(Config& config, const util::TomlDocument& document) {
   util::TomlTable log(document, "log");
   log.take("level", config.logLevel, 0, 100'000);
@@ -114,7 +121,7 @@ std::string contentsOf(const std::string& path) {
 
 Config parseConfig(const std::string& path, const std::string& text) try {
   const util::TomlDocument document(text);
-  document.refuseAllBut({"listen", "limits", "http", "pull", "agent", "log"});
+  document.refuseAllBut({"listen", "limits", "http", "pull", "agent", "audit", "log"});
   Config config;
   config.file = path;
   readListen(config, document);
@@ -122,6 +129,7 @@ Config parseConfig(const std::string& path, const std::string& text) try {
   readHttp(config, document);
   readPull(config, document);
   readAgent(config, document);
+  readAudit(config, document);
   readLog(config, document);
   return config;
 } catch (const util::TomlError& error) {

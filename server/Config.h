@@ -40,6 +40,9 @@ struct Config {
   std::string agentConfig;        ///< the agent's own configuration file; empty: the agent's default
   std::string providerDirectory;  ///< empty: beside the program
 
+  /// [audit]
+  std::string auditFile;  ///< empty: the audit's lines are in the log
+
   /// [log]
   int logLevel = util::kLevelWarning;    ///< lines below it are dropped
   std::optional<std::string> logTarget;  ///< absent: the agent's default

@@ -113,7 +113,7 @@ TEST_F(ServerConfig, TheExampleHasEveryKeyWithItsDefault) {
     text += line.substr(2) + "\n";
     ++keys;
   }
-  EXPECT_EQ(keys, 24U);
+  EXPECT_EQ(keys, 25U);
   const Config config = read(text);
   const Config defaults;
   EXPECT_EQ(config.port, defaults.port);

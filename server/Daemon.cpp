@@ -28,6 +28,7 @@
 #include "http/Listener.h"
 #include "http/Log.h"
 #include "schema/Schema.h"
+#include "server/AuditLog.h"
 #include "server/BrokerLog.h"
 #include "server/Systemd.h"
 #include "util/FileDescriptor.h"
@@ -76,10 +77,13 @@ void applyLog(const Config& config) {
   http::setLogLevel(config.logLevel);
 }
 
+AuditLog::Writer auditWriter(const Config& config) {
+  return config.auditFile.empty() ? auditInLog() : auditFile(config.auditFile);
+}
+
 cimom::ServiceOptions serviceOptions(const Config& config) {
   cimom::ServiceOptions options;
   options.log = logServiceLine;
-  options.changes = logChange;
   options.maxDepth = static_cast<std::size_t>(config.nesting);
   options.pullDefaultTimeout = std::chrono::seconds(config.pullSeconds);
   options.pullMaxTimeout = std::chrono::seconds(config.pullLongestSeconds);
@@ -131,6 +135,7 @@ class Daemon {
 
   const CommandLine commandLine_;
   Config config_;
+  std::unique_ptr<AuditLog> audit_;  ///< outlives what writes to it
   util::FileDescriptor signals_;
   std::vector<http::Listener> listeners_;
   std::unique_ptr<broker::Broker> broker_;
@@ -151,10 +156,13 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
   signals_ = util::FileDescriptor(::signalfd(-1, &signals, SFD_NONBLOCK | SFD_CLOEXEC));
   if (!signals_) throw std::runtime_error(std::string("cannot wait for signals: ") + std::strerror(errno));
 
+  audit_ = std::make_unique<AuditLog>(auditWriter(config_));
   const int inherited = countOfInheritedSockets();
   listeners_ = inherited > 0 ? http::adoptListeners(inherited) : http::listenOn(config_.addresses, config_.port);
   broker_ = makeBroker(config_);
-  service_ = std::make_unique<cimom::Service>(*broker_, serviceOptions(config_));
+  cimom::ServiceOptions options = serviceOptions(config_);
+  options.audit = [this](const access::AuditRecord& record) { audit_->take(record); };
+  service_ = std::make_unique<cimom::Service>(*broker_, std::move(options));
   server_ = std::make_unique<http::HttpServer>(
       config_.limits, config_.threads,
       [service = service_.get()](const http::HttpRequest& request, http::ResponseSink& sink) {
@@ -231,6 +239,7 @@ void Daemon::reload() try {
   Config fresh = configOf(commandLine_);
   zorva::agent::loadConfig(fresh.agentConfig);
   applyLog(fresh);
+  audit_->setWriter(auditWriter(fresh));
   makeRoomForConnections(fresh.limits);
   server_->setLimits(fresh.limits);
   if (fresh.addresses != config_.addresses || fresh.port != config_.port || fresh.threads != config_.threads ||
@@ -297,6 +306,11 @@ int check(const Config& config, const MakeBroker& makeBroker) {
     tryLog(config);
   } catch (const std::exception& error) {
     problems.push_back(std::string("log.target: ") + error.what());
+  }
+  try {
+    auditWriter(config);
+  } catch (const std::exception& error) {
+    problems.push_back(std::string("audit.file: ") + error.what());
   }
   tryProviders(config, makeBroker, problems);
   for (const std::string& each : problems) tellError(each);

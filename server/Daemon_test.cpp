@@ -120,9 +120,9 @@ TEST(Daemon, LogsAChangeAtTheDefaultLevel) {
       "CIMOperation: MethodCall\r\nCIMMethod: SetProperty\r\nCIMObject: root/cimv2\r\n"));
   const WireResponse response = wire.receive();
   EXPECT_THAT(response.body, HasSubstr("<IMETHODRESPONSE NAME=\"SetProperty\"></IMETHODRESPONSE>"));
-  EXPECT_TRUE(daemon.logs(" changed root/cimv2:ZORVA_DNSProtocolEndPoint.")) << daemon.log();
-  EXPECT_THAT(daemon.log(), HasSubstr(" 127.0.0.1:"));
-  EXPECT_THAT(daemon.log(), HasSubstr(": DomainName\n"));
+  EXPECT_TRUE(daemon.logs(" operation=SetProperty object=\"root/cimv2:ZORVA_DNSProtocolEndPoint.")) << daemon.log();
+  EXPECT_THAT(daemon.log(), HasSubstr(" login=none from=\"127.0.0.1:"));
+  EXPECT_THAT(daemon.log(), HasSubstr(R"( change="DomainName: \"example.org\" -> \"example.net\"" result="done")"));
 }
 
 // ---- Hostile requests ----

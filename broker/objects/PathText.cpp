@@ -270,6 +270,16 @@ std::string pathText(const ObjectPath& path) {
   return text;
 }
 
+std::string literalText(const Value& value) {
+  if (value.isNull) return "NULL";
+  if (!value.isArray) return std::visit(ScalarText(), value.scalar);
+  std::string text = "{";
+  for (const Scalar& element : value.elements) {
+    text += (text.size() > 1 ? ", " : "") + std::visit(ScalarText(), element);
+  }
+  return text + "}";
+}
+
 std::string quotedText(std::string_view text) {
   std::string quoted = "\"";
   for (const char c : text) {

@@ -35,6 +35,9 @@ Expected<ObjectPath, PathTextError> parsePathText(std::string_view text);
 /// The path's text; parsePathText reads it back, with references as texts.
 std::string pathText(const ObjectPath& path);
 
+/// A value as in MOF: texts in quotes, an array in braces, NULL. A reference is its path's text in quotes.
+std::string literalText(const Value& value);
+
 /// `text` in double quotes, escaped as in MOF.
 std::string quotedText(std::string_view text);
 

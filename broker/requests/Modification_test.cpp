@@ -104,6 +104,7 @@ TEST_F(ModificationTest, AWholeInstanceAsItIsChangesNothing) {
 TEST_F(ModificationTest, ReportsItsChangesInTheTypesOfTheSchema) {
   expectHanded(modify({{"SIZE", Value::text("9")}, labels({"x", "y"})}), "all Size 9");
   EXPECT_EQ(effect_.changes, std::vector<Property>{size(9)});
+  EXPECT_EQ(effect_.before, std::vector<Value>{size(7).value});
 }
 
 TEST_F(ModificationTest, ReadsAgainWhatItChanged) {

@@ -54,10 +54,10 @@ struct MethodResult {
 
 /// What a modification was to change, and its effect: a provider may report success and store nothing.
 struct ModificationEffect {
-  std::vector<Property>
-      changes;     ///< the changes that the provider was asked to make, in the types that the schema declares
-  Status reading;  ///< status of reading the instance again, under the same claim; only after a success
-  Instance now;    ///< if that was a success, and there were changes
+  std::vector<Property> changes;  ///< what the provider was asked to change, in the types that the schema declares
+  std::vector<Value> before;      ///< the value of each of these until then; null if the provider cannot be read
+  Status reading;                 ///< status of reading the instance again, under the same claim; only after a success
+  Instance now;                   ///< if that was a success, and there were changes
 };
 
 }  // namespace zorva::broker

@@ -319,19 +319,22 @@ class CurrentTaker : public Taker {
   const InstanceObject* current_ = nullptr;
 };
 
-void listChanges(const Modification& modification, std::vector<Property>& changes) {
+void listChanges(const Modification& modification, const InstanceObject* current, ModificationEffect& effect) {
   for (const PropertyInfo* property : modification.changed) {
-    Property& change = changes.emplace_back();
+    Property& change = effect.changes.emplace_back();
     change.name = property->declared->name;
     change.declaration = property->declared;
     fillValue(modification.handed->find(*property)->data, change.value);
+    const InstanceObject::Slot* slot = current != nullptr ? current->find(*property) : nullptr;
+    Value& before = effect.before.emplace_back(Value::null(change.value.type, change.value.isArray));
+    if (slot != nullptr) fillValue(slot->data, before);
   }
 }
 
 }  // namespace
 
 Status Request::modify(const PathObject& path, const InstanceObject& instance, const Shape& shape,
-                       std::vector<Property>* changes) {
+                       ModificationEffect* effect) {
   const Expected<PathObject*, Status> found = resolve(path);
   if (!found) return found.error();
   PathObject* resolved = *found;
@@ -345,7 +348,7 @@ Status Request::modify(const PathObject& path, const InstanceObject& instance, c
   Modification modification;
   status = planModification(arena(), {*resolved, instance, taker.current(), shape, *entry}, modification);
   if (!status.ok() || modification.changed.empty()) return status;
-  if (changes != nullptr) listChanges(modification, *changes);
+  if (effect != nullptr) listChanges(modification, taker.current(), *effect);
   const char** list = providerList(shape, {resolved->info});
   ResultObject result(core_, ResultObject::Nothing, nullptr, entry->prefix);
   return call(result, *entry, "ModifyInstance", mi->ft->modifyInstance, mi, &context_, &result, resolved,

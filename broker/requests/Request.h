@@ -12,6 +12,7 @@
 #include "broker/objects/Objects.h"
 #include "broker/objects/Scope.h"
 #include "broker/requests/HeldClaim.h"
+#include "broker/requests/Operations.h"
 #include "broker/requests/Result.h"
 #include "broker/requests/ResultFilter.h"
 #include "util/Expected.h"
@@ -48,9 +49,9 @@ class Request : util::NotCopied {
   Status enumerate(const PathObject& path, Form form, const Shape& shape, Taker& taker);
   Status get(const PathObject& path, const Shape& shape, Taker& taker);
   Status create(const PathObject& path, const InstanceObject& instance, Taker& taker);
-  /// `changes`, where it is not null, gets what is changed.
+  /// `effect`, where it is not null, gets what is changed, and its values before.
   Status modify(const PathObject& path, const InstanceObject& instance, const Shape& shape,
-                std::vector<Property>* changes = nullptr);
+                ModificationEffect* effect = nullptr);
   Status remove(const PathObject& path);
   Status associated(const PathObject& path, Form form, const FarEnd& filter, const Shape& shape, Taker& taker);
   Status referring(const PathObject& path, Form form, const FarEnd& filter, const Shape& shape, Taker& taker);

@@ -119,9 +119,9 @@ TestService::TestService(ServiceOptions options) {
   broker_.emplace(broker::testing::testClasses(), std::move(made));
   options.hostName = "this";
   options.log = log();
-  options.changes = [this](const std::string& line) {
+  options.audit = [this](const access::AuditRecord& record) {
     const std::lock_guard lock(mutex_);
-    changes_.push_back(line);
+    changes_.push_back(access::auditLine(record));
   };
   service_.emplace(*broker_, std::move(options));
 }

@@ -65,7 +65,7 @@ class TestService {
                   const std::string& nameSpace = "root/cimv2");
 
   std::vector<std::string> lines();
-  /// The lines about changes.
+  /// The audit's lines.
   std::vector<std::string> changes();
   broker::Broker& broker() { return *broker_; }
   Service& service() { return *service_; }
