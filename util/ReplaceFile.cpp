@@ -13,8 +13,6 @@
 namespace zorva::util {
 namespace {
 
-constexpr mode_t kFileMode = 0644;
-
 void writeAndSync(const FileDescriptor& file, std::string_view text, const std::string& path) {
   if (!writeAll(file, text)) throwFileError(path, "cannot be written");
   if (::fsync(file.get()) != 0) throwFileError(path, "cannot be synced");
@@ -49,7 +47,7 @@ std::string replaceFile(const std::string& directory, const std::string& name, c
   TemporaryFile temporary(target + ".new");
   {
     const FileDescriptor file(::open(temporary.path().c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC | O_NOFOLLOW,
-                                     like == nullptr ? kFileMode : S_IRUSR | S_IWUSR));
+                                     like == nullptr ? rightsIn(directory) : S_IRUSR | S_IWUSR));
     if (!file) throwFileError(temporary.path(), "cannot be opened");
     if (like != nullptr) {
       giveRights(file, *like);
@@ -68,6 +66,15 @@ void overwriteFile(const std::string& path, const std::string& text) {
   const FileDescriptor file(::open(path.c_str(), O_WRONLY | O_TRUNC | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
   if (!file) throwFileError(path, "cannot be opened");
   writeAndSync(file, text, path);
+}
+
+mode_t rightsIn(const std::string& directory) {
+  struct stat status {};
+  if (::stat(directory.c_str(), &status) != 0) return S_IRUSR | S_IWUSR;
+  mode_t rights = S_IRUSR | S_IWUSR;
+  if ((status.st_mode & S_IXGRP) != 0) rights |= S_IRGRP;
+  if ((status.st_mode & S_IXOTH) != 0) rights |= S_IROTH;
+  return rights;
 }
 
 void giveToOwnerOfDirectory(const FileDescriptor& file, const std::string& path) {

@@ -1,5 +1,6 @@
 // ifcfg init, ifcfg show, ifcfg list, ifcfg remove, ifcfg adopt.
 
+#include <pwd.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -45,7 +46,13 @@ std::string settingTable(const std::vector<SettingLine>& lines, const Layout& la
 void makeDefaultDirectory() {
   const std::string directory = zorva::agent::dataDirectory();
   if (directory != zorva::agent::kDefaultDataDir || ::geteuid() != 0) return;
-  if (::mkdir(directory.c_str(), 0755) == 0 || errno == EEXIST) return;
+  // The user of the server, if there is one, owns it; then the rest of the host reads through the server.
+  const passwd* const server = ::getpwnam("zorva");
+  if (::mkdir(directory.c_str(), server != nullptr ? 0750 : 0755) == 0) {
+    if (server == nullptr || ::chown(directory.c_str(), server->pw_uid, server->pw_gid) == 0) return;
+  } else if (errno == EEXIST) {
+    return;
+  }
   throw Failure(ExitCode::Failed, directory + ": cannot be made: " + std::strerror(errno));
 }
 

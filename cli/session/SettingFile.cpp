@@ -47,7 +47,8 @@ class DraftFile {
   /// Writes the whole text to the disk. False with errno if that fails.
   bool fill(std::string_view text) const {
     util::giveToOwnerOfDirectory(descriptor_, path_);
-    return util::writeAll(descriptor_, text) && ::fchmod(descriptor_.get(), 0644) == 0 &&
+    const std::string folder = path_.substr(0, path_.rfind('/') + 1);
+    return util::writeAll(descriptor_, text) && ::fchmod(descriptor_.get(), util::rightsIn(folder)) == 0 &&
            ::fsync(descriptor_.get()) == 0;
   }
 

@@ -46,11 +46,14 @@ TEST_F(SettingFileTest, WritesEachLineOnce) {
   EXPECT_EQ(contentsOf(directory_ / "ifcfg-eth0"), "HOSTNAME=h\nDNSSERVERS=192.0.2.1 192.0.2.2 \n");
 }
 
-TEST_F(SettingFileTest, CanBeReadByEveryone) {
-  SettingFile("eth0").write({{"A", "1"}}, false);
-  struct stat status {};
-  ASSERT_EQ(::stat((directory_ / "ifcfg-eth0").c_str(), &status), 0);
-  EXPECT_EQ(status.st_mode & 0777U, 0644U);
+TEST_F(SettingFileTest, CanBeReadByWhoMayEnterItsDirectory) {
+  for (const auto& [ofDirectory, ofFile] : {std::pair{0755U, 0644U}, {0750U, 0640U}, {0700U, 0600U}}) {
+    ASSERT_EQ(::chmod(directory_.path().c_str(), ofDirectory), 0);
+    SettingFile("eth0").write({{"A", "1"}}, true);
+    struct stat status {};
+    ASSERT_EQ(::stat((directory_ / "ifcfg-eth0").c_str(), &status), 0);
+    EXPECT_EQ(status.st_mode & 0777U, ofFile);
+  }
 }
 
 TEST_F(SettingFileTest, LeavesAnExistingFileUnlessToldOtherwise) {
