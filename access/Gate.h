@@ -15,15 +15,17 @@ namespace zorva::access {
 struct Decision {
   enum class Kind : std::uint8_t {
     Admitted,    ///< `client` is set
-    MustVerify,  ///< a password has to be checked, which is slow: call verify() on a thread that may wait
+    MustVerify,  ///< that needs slow work, such as checking a password: call verify() on a thread that may wait
     NeedsLogin,  ///< the client has to log in, or its login is wrong: HTTP status 401
+    TooEarly,    ///< logins of this address failed, the next one is taken after `delay`: HTTP status 503
     Refused,     ///< a login would not help: HTTP status 403
   };
 
   Kind kind = Kind::Refused;
   ClientPtr client = nullptr;
-  std::string why = {};                ///< of a refusal: a sentence for the client's user
-  std::chrono::milliseconds delay{0};  ///< how long the answer to a failed login is held back
+  std::string why = {};  ///< of a refusal: a sentence for the client's user
+  /// NeedsLogin: how long the answer to a failed login is held back. TooEarly: when to come again.
+  std::chrono::milliseconds delay{0};
 };
 
 class Gate : util::NotCopied {
@@ -34,7 +36,8 @@ class Gate : util::NotCopied {
   /// request has none. Called on event threads for each request, so it must be quick and must not wait.
   virtual Decision decide(const Origin& origin, const std::string* authorization) = 0;
 
-  /// Checks a password; takes some tens of milliseconds of processor time. Called on one thread at a time.
+  /// Decides the rest; checking a password takes some tens of milliseconds of processor time. `authorization` is empty
+  /// if the request has none. Called on one thread at a time.
   virtual Decision verify(const Origin& origin, const std::string& authorization) = 0;
 };
 

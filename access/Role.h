@@ -29,6 +29,11 @@ class Grants {
 
   Role everywhere() const noexcept { return everywhere_; }
 
+  using ByNameSpace = std::map<std::string, Role, util::NameLess>;
+  const ByNameSpace& byNameSpace() const noexcept { return byNameSpace_; }
+
+  bool operator==(const Grants&) const = default;
+
   /// Names of namespaces are compared without regard to case.
   Role in(std::string_view nameSpace) const {
     const auto found = byNameSpace_.find(nameSpace);
@@ -37,7 +42,7 @@ class Grants {
 
  private:
   Role everywhere_;
-  std::map<std::string, Role, util::NameLess> byNameSpace_;
+  ByNameSpace byNameSpace_;
 };
 
 /// How the server knows who a client is.
