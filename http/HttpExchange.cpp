@@ -251,6 +251,17 @@ void HttpExchange::suspend() {
   MHD_suspend_connection(connection_);
 }
 
+void HttpExchange::decide(access::Decision decision) {
+  const std::lock_guard lock(mutex_);
+  decision_ = std::move(decision);
+  wake();
+}
+
+access::Decision HttpExchange::takeDecision() {
+  const std::lock_guard lock(mutex_);
+  return std::move(decision_);
+}
+
 bool HttpExchange::isPublished() const { return published_.load(std::memory_order_acquire); }
 
 MHD_Result HttpExchange::respond() {
@@ -330,7 +341,9 @@ HeaderList headersOf(const Refusal& refusal) {
   if (!refusal.cimError.empty()) headers.emplace_back("CIMError", refusal.cimError);
   if (!refusal.allow.empty()) headers.emplace_back(MHD_HTTP_HEADER_ALLOW, refusal.allow);
   if (!refusal.login.empty()) headers.emplace_back(MHD_HTTP_HEADER_WWW_AUTHENTICATE, refusal.login);
-  if (refusal.status == 503) headers.emplace_back(MHD_HTTP_HEADER_RETRY_AFTER, "1");
+  if (refusal.status == 503) {
+    headers.emplace_back(MHD_HTTP_HEADER_RETRY_AFTER, std::to_string(refusal.retrySeconds));
+  }
   return headers;
 }
 

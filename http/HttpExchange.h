@@ -21,6 +21,7 @@
 #include <string>
 #include <string_view>
 
+#include "access/Gate.h"
 #include "http/Connections.h"
 #include "http/Exchange.h"
 #include "http/Gzip.h"
@@ -36,7 +37,7 @@ class WaitListener {
   virtual void goesOn() = 0;
 };
 
-class HttpExchange final : public ResponseSink {
+class HttpExchange final : public ResponseSink, public std::enable_shared_from_this<HttpExchange> {
  public:
   using Clock = std::chrono::steady_clock;
 
@@ -48,6 +49,7 @@ class HttpExchange final : public ResponseSink {
   HttpRequest request;
   std::optional<Refusal> refusal;  ///< the response, if no work is needed
   bool headIsRead = false;
+  bool awaitsLogin = false;  ///< decide() will be called; used by the event thread
   bool takesGzip = false;
   bool isHttp11 = true;
   const std::shared_ptr<Connection> client;
@@ -57,6 +59,9 @@ class HttpExchange final : public ResponseSink {
   /// Suspends the connection until there is a response. Call it before the work may begin: then neither waits for the
   /// other.
   void suspend();
+
+  /// The decision of decide().
+  access::Decision takeDecision();
 
   /// Whether respond() may be called: there is a response, or its beginning.
   bool isPublished() const;
@@ -87,6 +92,9 @@ class HttpExchange final : public ResponseSink {
   void finish(const Refusal& orElse);
 
   // ---- Any thread ----
+
+  /// Takes the decision on who the client is, and lets its suspended connection go on.
+  void decide(access::Decision decision);
 
   /// How long the work has run, without the time in which it waited for the client; 0 if it has not begun.
   Clock::duration worked() const;
@@ -128,6 +136,7 @@ class HttpExchange final : public ResponseSink {
   std::atomic<bool> published_ = false;  ///< set under the lock
 
   mutable std::mutex mutex_;
+  access::Decision decision_;
   std::condition_variable room_;
   WaitListener* waits_ = nullptr;
   int status_ = 0;

@@ -21,14 +21,35 @@
 #include "http/Connections.h"
 #include "http/HttpExchange.h"
 #include "http/Log.h"
+#include "http/LoginQueue.h"
 #include "http/RequestHead.h"
 #include "http/Workers.h"
+#include "util/Names.h"
 
 namespace zorva::http {
 
 namespace {
 
 constexpr std::string_view kLogin = "Basic realm=\"zorvacimd\", charset=\"UTF-8\"";
+
+/// Nothing if the client is let in.
+std::optional<Refusal> refusalOf(access::Decision& decision) {
+  using Kind = access::Decision::Kind;
+  switch (decision.kind) {
+    case Kind::Admitted:
+      return std::nullopt;
+    case Kind::NeedsLogin:
+      return Refusal{401, std::move(decision.why), {}, {}, kLogin};
+    case Kind::TooEarly: {
+      const auto seconds = std::chrono::ceil<std::chrono::seconds>(decision.delay).count();
+      return Refusal{503, std::move(decision.why), {}, {}, {}, static_cast<int>(seconds)};
+    }
+    case Kind::MustVerify:
+    case Kind::Refused:
+      break;
+  }
+  return Refusal{403, std::move(decision.why), {}};
+}
 
 /// What the HTTP library stores for a request.
 using Holder = std::shared_ptr<HttpExchange>;
@@ -71,6 +92,9 @@ class HttpServer::Core {
 
   MHD_Result readHead(Holder& exchange, MHD_Connection* connection, const char* method, const char* version);
   std::optional<Refusal> admit(HttpExchange& exchange);
+  void awaitLogin(HttpExchange& exchange, const std::string* authorization);
+  MHD_Result loginIsDecided(HttpExchange& exchange, MHD_Connection* connection);
+  static std::optional<Refusal> letIn(HttpExchange& exchange, access::Decision decision);
   void readBody(HttpExchange& exchange, std::string_view data);
   void releaseBody(HttpExchange& exchange);
   bool answersAtOnce(HttpExchange& exchange) const;
@@ -86,6 +110,7 @@ class HttpServer::Core {
   const std::shared_ptr<access::Gate> gate_;
   Connections connections_;
   Workers workers_;
+  LoginQueue logins_;
   std::atomic<std::size_t> bodies_ = 0;  ///< bytes of unfinished requests
   std::atomic<std::size_t> requests_ = 0;
   MHD_Daemon* daemon_ = nullptr;
@@ -96,7 +121,8 @@ HttpServer::Core::Core(const HttpLimits& limits, int threads, Handler handler, s
     : limits_(limits),
       page_(std::move(page)),
       gate_(std::move(gate)),
-      workers_(limits, [work = std::move(handler)](HttpExchange& exchange) { work(exchange.request, exchange); }) {
+      workers_(limits, [work = std::move(handler)](HttpExchange& exchange) { work(exchange.request, exchange); }),
+      logins_(gate_) {
   startDaemon(threads);
 }
 
@@ -123,6 +149,7 @@ void HttpServer::Core::startDaemon(int threads) {
 
 HttpServer::Core::~Core() {
   workers_.giveUpAll();
+  logins_.giveUpAll();
   if (daemon_ != nullptr) MHD_stop_daemon(daemon_);
 }
 
@@ -155,6 +182,7 @@ void HttpServer::Core::take(int socket, const sockaddr_storage& peer, socklen_t 
 void HttpServer::Core::sweep() {
   connections_.sweep(limits());
   workers_.sweep();
+  logins_.sweep();
 }
 
 bool HttpServer::Core::hasWork() const {
@@ -171,9 +199,11 @@ bool HttpServer::Core::stop() {
   };
   waitUntil(Clock::now() + limits().drain);
   workers_.giveUpAll();
+  logins_.giveUpAll();
   waitUntil(Clock::now() + kLastAnswers);
   MHD_stop_daemon(std::exchange(daemon_, nullptr));
-  return workers_.join(kLastAnswers);
+  const bool isLoginDone = logins_.join(kLastAnswers);
+  return workers_.join(kLastAnswers) && isLoginDone;
 }
 
 // ---- Called by the HTTP library ----
@@ -203,6 +233,7 @@ MHD_Result HttpServer::Core::onRequest(void* self, MHD_Connection* connection, c
   Core& core = *static_cast<Core*>(self);
   Holder& exchange = *static_cast<Holder*>(*holder);
   if (!exchange->headIsRead) return core.readHead(exchange, connection, method, version);
+  if (exchange->awaitsLogin) return core.loginIsDecided(*exchange, connection);
   if (*size > 0) {
     core.readBody(*exchange, {data, *size});
     *size = 0;
@@ -248,19 +279,42 @@ MHD_Result HttpServer::Core::readHead(Holder& exchange, MHD_Connection* connecti
 std::optional<Refusal> HttpServer::Core::admit(HttpExchange& exchange) {
   HttpRequest& request = exchange.request;
   if (asksForPage(request.method, request.path)) return std::nullopt;
-  access::Decision decision =
-      gate_->decide(exchange.client->origin(), findHeader(request.headers, MHD_HTTP_HEADER_AUTHORIZATION));
-  switch (decision.kind) {
-    case access::Decision::Kind::Admitted:
-      request.who = std::move(decision.client);
-      return std::nullopt;
-    case access::Decision::Kind::NeedsLogin:
-      return Refusal{401, std::move(decision.why), {}, {}, kLogin};
-    case access::Decision::Kind::MustVerify:
-    case access::Decision::Kind::Refused:
-      break;
-  }
-  return Refusal{403, std::move(decision.why), {}};
+  const std::string* authorization = findHeader(request.headers, MHD_HTTP_HEADER_AUTHORIZATION);
+  access::Decision decision = gate_->decide(exchange.client->origin(), authorization);
+  if (decision.kind != access::Decision::Kind::MustVerify) return letIn(exchange, std::move(decision));
+  awaitLogin(exchange, authorization);
+  return std::nullopt;
+}
+
+/// The password in the header field is needed no longer.
+std::optional<Refusal> HttpServer::Core::letIn(HttpExchange& exchange, access::Decision decision) {
+  std::erase_if(exchange.request.headers,
+                [](const auto& field) { return util::sameName(field.first, MHD_HTTP_HEADER_AUTHORIZATION); });
+  auto refusal = refusalOf(decision);
+  if (!refusal) exchange.request.who = std::move(decision.client);
+  return refusal;
+}
+
+/// The body is not read before the client is known.
+void HttpServer::Core::awaitLogin(HttpExchange& exchange, const std::string* authorization) {
+  exchange.awaitsLogin = true;
+  exchange.client->enter(Phase::Working);
+  exchange.suspend();
+  logins_.submit(
+      {exchange.client->origin(), authorization == nullptr ? std::string() : *authorization,
+       [held = exchange.shared_from_this()](access::Decision decision) { held->decide(std::move(decision)); }});
+}
+
+MHD_Result HttpServer::Core::loginIsDecided(HttpExchange& exchange, MHD_Connection* connection) {
+  exchange.awaitsLogin = false;
+  access::Decision decision = exchange.takeDecision();
+  // The gate itself logs a login that failed.
+  const bool isNew = decision.kind != access::Decision::Kind::NeedsLogin;
+  const auto refusal = letIn(exchange, std::move(decision));
+  exchange.client->enter(refusal ? Phase::Sending : Phase::Arriving);
+  if (!refusal) return MHD_YES;
+  if (isNew) logRefusal(exchange, *refusal);
+  return respondWith(connection, *refusal);
 }
 
 void HttpServer::Core::readBody(HttpExchange& exchange, std::string_view data) {

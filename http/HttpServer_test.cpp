@@ -14,6 +14,7 @@
 #include <thread>
 
 #include "http/Listener.h"
+#include "http/RequestHead.h"
 #include "http/testing/TestWire.h"
 
 namespace zorva::http {
@@ -57,9 +58,10 @@ class Gate {
 /// An HTTP server on a free port, with a thread that accepts and sweeps.
 class Server {
  public:
-  explicit Server(HttpServer::Handler handler, const HttpLimits& limits = {}, std::string page = {})
+  explicit Server(HttpServer::Handler handler, const HttpLimits& limits = {}, std::string page = {},
+                  std::shared_ptr<access::Gate> gate = std::make_shared<access::OpenGate>(access::Role::Operate))
       : listeners_(listenOn(Addresses{"127.0.0.1"}, 0)),
-        server_(limits, 2, std::move(handler), std::move(page)),
+        server_(limits, 2, std::move(handler), std::move(page), std::move(gate)),
         thread_([this] { run(); }) {}
   ~Server() {
     ending_ = true;
@@ -581,6 +583,135 @@ TEST(HttpServer, StopWaitsForRequestsInWorkAndAbandonsTheRest) {
   EXPECT_EQ(slow.receive().body, "slow");
   EXPECT_THAT(hanging.receive().body, HasSubstr("the server is ending"));
   gate.open();
+}
+
+// ---- Logins ----
+
+using Barrier = Gate;
+
+/// Every login waits at a barrier. Then "right" is let in and "early" must come again; the rest fails. Without a login
+/// a client is let in at once.
+class SlowGate final : public access::Gate {
+ public:
+  explicit SlowGate(Barrier& barrier) : barrier_(barrier) {}
+
+  access::Decision decide(const access::Origin&, const std::string* authorization) override {
+    if (authorization == nullptr) return {access::Decision::Kind::Admitted, client("anonymous")};
+    return {access::Decision::Kind::MustVerify};
+  }
+
+  access::Decision verify(const access::Origin&, const std::string& authorization) override {
+    barrier_.wait();
+    if (authorization == "right") return {access::Decision::Kind::Admitted, client("alice")};
+    if (authorization == "early") return {access::Decision::Kind::TooEarly, nullptr, "too early", milliseconds(1200)};
+    return {access::Decision::Kind::NeedsLogin, nullptr, "the login is wrong", milliseconds(10)};
+  }
+
+ private:
+  static access::ClientPtr client(const char* name) {
+    return std::make_shared<const access::Client>(
+        access::Client{name, access::Proof::Password, access::Grants(access::Role::Read)});
+  }
+
+  Barrier& barrier_;
+};
+
+class HttpServerLogin : public ::testing::Test {
+ protected:
+  ~HttpServerLogin() override { gate_.open(); }
+
+  static std::string login(const std::string& text) { return "Authorization: " + text + "\r\n"; }
+
+  static HttpLimits limits() {
+    HttpLimits limits;
+    limits.drain = milliseconds(50);
+    return limits;
+  }
+
+  Gate gate_;
+  /// Answers with the user and the body.
+  Server server_{[](const HttpRequest& request, ResponseSink& sink) {
+                   EXPECT_EQ(findHeader(request.headers, "Authorization"), nullptr);
+                   answer(sink, request.who->user + " " + request.body);
+                 },
+                 limits(),
+                 {},
+                 std::make_shared<SlowGate>(gate_)};
+  Wire wire_{server_.port()};
+};
+
+TEST_F(HttpServerLogin, ALoginThatIsRightIsAnswered) {
+  gate_.open();
+  for (const char* body : {"one", "two"}) {
+    ASSERT_TRUE(wire_.send(testing::posting(body, login("right"))));
+    EXPECT_EQ(wire_.receive().body, std::string("alice ") + body);
+  }
+}
+
+TEST_F(HttpServerLogin, ALoginThatIsWrongIsRefusedAndMayBeTriedAgain) {
+  gate_.open();
+  ASSERT_TRUE(wire_.send(testing::posting("x", login("wrong"))));
+  const WireResponse response = wire_.receive();
+  EXPECT_EQ(response.status, 401);
+  EXPECT_EQ(response.headers.at("www-authenticate"), "Basic realm=\"zorvacimd\", charset=\"UTF-8\"");
+  EXPECT_EQ(response.body, "the login is wrong\n");
+}
+
+TEST_F(HttpServerLogin, WhoIsTooEarlyHearsWhenToComeAgain) {
+  gate_.open();
+  ASSERT_TRUE(wire_.send(testing::posting("x", login("early"))));
+  const WireResponse response = wire_.receive();
+  EXPECT_EQ(response.status, 503);
+  EXPECT_EQ(response.headers.at("retry-after"), "2");
+}
+
+TEST_F(HttpServerLogin, OthersAreServedWhileALoginIsChecked) {
+  ASSERT_TRUE(wire_.send(testing::posting("x", login("right"))));
+  for (int i = 0; i < 10; ++i) {
+    Wire other(server_.port());
+    ASSERT_TRUE(other.send(testing::posting("x")));
+    EXPECT_EQ(other.receive().body, "anonymous x");
+  }
+  gate_.open();
+  EXPECT_EQ(wire_.receive().body, "alice x");
+}
+
+TEST_F(HttpServerLogin, TheBodyIsNotReadBeforeTheClientIsKnown) {
+  ASSERT_TRUE(wire_.send("POST /x HTTP/1.1\r\nHost: x\r\nContent-Length: 2\r\nExpect: 100-continue\r\n" +
+                         login("right") + "\r\n"));
+  EXPECT_EQ(wire_.take(1, milliseconds(100)), "");
+  gate_.open();
+  EXPECT_EQ(wire_.receive().status, 100);
+  ASSERT_TRUE(wire_.send("ok"));
+  EXPECT_EQ(wire_.receive().body, "alice ok");
+}
+
+TEST_F(HttpServerLogin, ALargeBodyAfterALoginArrivesWhole) {
+  gate_.open();
+  const std::string body = longText(1'000'000);
+  ASSERT_TRUE(wire_.send(testing::posting(body, login("right"))));
+  EXPECT_TRUE(wire_.receive().body == "alice " + body);
+}
+
+TEST_F(HttpServerLogin, AClientMayLeaveWhileItsLoginIsChecked) {
+  {
+    Wire leaving(server_.port());
+    ASSERT_TRUE(leaving.send(testing::posting("x", login("right"))));
+    ASSERT_TRUE(wire_.send(testing::posting("x", login("right"))));
+    std::this_thread::sleep_for(milliseconds(50));
+  }
+  gate_.open();
+  EXPECT_EQ(wire_.receive().body, "alice x");
+}
+
+TEST_F(HttpServerLogin, TheEndDoesNotWaitForALogin) {
+  ASSERT_TRUE(wire_.send(testing::posting("x", login("right"))));
+  Wire second(server_.port());
+  ASSERT_TRUE(second.send(testing::posting("x", login("right"))));
+  std::this_thread::sleep_for(milliseconds(50));
+  EXPECT_FALSE(server_.http().stop()) << "the gate is stuck";
+  EXPECT_EQ(wire_.receive().status, 503);
+  EXPECT_EQ(second.receive().status, 503);
 }
 
 }  // namespace

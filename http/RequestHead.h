@@ -27,6 +27,7 @@ struct Refusal {
   std::string_view cimError;  ///< value of the header CIMError (DSP0200 7.3.3); empty: none
   std::string_view allow{};   ///< value of the header Allow; empty: none
   std::string_view login{};   ///< value of the header WWW-Authenticate; empty: none
+  int retrySeconds = 1;       ///< value of the header Retry-After, for status 503
 };
 
 /// Whether the request may go on to its body. Requests that are answered without a body may: OPTIONS, and GET and HEAD
