@@ -58,10 +58,19 @@ Status checkParameterNames(const cimxml::Call& call) {
           call.name + ": the parameter " + broker::quotedText(name.substr(0, 80)) + " is there twice"};
 }
 
-bool changesSomething(const cimxml::Call& call) noexcept {
+/// The one method that is known to read only. What the others change is not known here.
+bool onlyReads(const Operation& operation, const broker::ObjectPath& path) {
+  const schema::Class* declared = operation.classes().find(path.className);
+  const schema::ClassMethod* method = declared != nullptr ? declared->findMethod(operation.call.name) : nullptr;
+  return method != nullptr && method->name == "GetCentralInstances";
+}
+
+bool changesSomething(const Operation& operation) {
   constexpr std::string_view kChanges[] = {"ModifyInstance", "SetProperty", "CreateInstance", "DeleteInstance"};
-  return call.isExtrinsic || std::any_of(std::begin(kChanges), std::end(kChanges),
-                                         [&](auto each) { return util::sameName(each, call.name); });
+  const cimxml::Call& call = operation.call;
+  if (call.isExtrinsic) return !onlyReads(operation, call.target);
+  return std::any_of(std::begin(kChanges), std::end(kChanges),
+                     [&](auto each) { return util::sameName(each, call.name); });
 }
 
 /// The object that a refused operation names, as far as it can be read.
@@ -76,10 +85,10 @@ broker::ObjectPath objectOf(const cimxml::Call& call) {
 Status checkRole(const Operation& operation) {
   if (operation.who == nullptr) return {};
   const access::Role has = operation.who->grants.in(operation.nameSpace);
-  // What a method changes is not known here.
-  if (has >= (changesSomething(operation.call) ? access::Role::Operate : access::Role::Read)) return {};
+  const bool changes = changesSomething(operation);
+  if (has >= (changes ? access::Role::Operate : access::Role::Read)) return {};
   broker::ObjectPath object;
-  if (changesSomething(operation.call)) object = objectOf(operation.call);
+  if (changes) object = objectOf(operation.call);
   object.nameSpace = operation.nameSpace;
   noteObject(operation, object);
   const std::string who = operation.who->user.empty() ? "a client without a login" : operation.who->user;
@@ -110,6 +119,12 @@ Status carryOut(Operation& operation) {
   Status status = checkRole(operation);
   if (status.ok()) status = checkParameterNames(call);
   return asCim(status.ok() ? function(operation) : std::move(status));
+}
+
+bool mayRead(const Operation& operation, const broker::ObjectPath& result) {
+  if (operation.who == nullptr) return true;
+  const std::string& in = result.nameSpace.empty() ? operation.nameSpace : result.nameSpace;
+  return operation.who->grants.in(in) >= access::Role::Read;
 }
 
 void noteObject(const Operation& operation, const broker::ObjectPath& path) {
@@ -213,10 +228,9 @@ Status checkSaidTypes(const Operation& operation) {
   return {};
 }
 
-/// What a method changes is not known here, so each call is noted, except for the one method that is known to read
-/// only.
+/// What a method changes is not known here, so each call is noted.
 void noteCall(const Operation& operation, const broker::ObjectPath& path) {
-  if (util::sameName(operation.call.name, "GetCentralInstances")) return;
+  if (onlyReads(operation, path)) return;
   noteObject(operation, path);
   for (const broker::NamedValue& argument : operation.call.input) {
     operation.record.changes.push_back({argument.name, {}, broker::literalText(argument.value)});

@@ -58,6 +58,9 @@ broker::Status canonicalizePath(const Operation& operation, broker::ObjectPath& 
 /// The same for the references in a value.
 void canonicalizeValue(const Operation& operation, broker::Value& value);
 
+/// Whether the client may read in the namespace of a result, which may be another one than the operation's.
+bool mayRead(const Operation& operation, const broker::ObjectPath& result);
+
 /// Notes which object the operation changes, or tries to.
 void noteObject(const Operation& operation, const broker::ObjectPath& path);
 

@@ -105,6 +105,7 @@ Status answerOfClass(Operation& operation, const Question& question) {
 Status answerNames(Operation& operation, const Question& question) {
   Stream stream(operation.writer);
   const broker::PathSink write = [&](const broker::ObjectPath& path) {
+    if (!mayRead(operation, path)) return true;
     return stream.put([&](std::string& out) {
       out += "<OBJECTPATH>";
       cimxml::appendWholePath(out, path, operation.host.name());
@@ -124,6 +125,7 @@ Status answerInstances(Operation& operation, const Question& question) {
   Stream stream(operation.writer);
   const cimxml::InstanceDetail detail = detailOf(operation, question.selection);
   const broker::InstanceSink write = [&](const broker::Instance& instance) {
+    if (!mayRead(operation, instance.path)) return true;
     return stream.put([&](std::string& out) {
       out += "<VALUE.OBJECTWITHPATH>";
       cimxml::appendWholePath(out, instance.path, operation.host.name());

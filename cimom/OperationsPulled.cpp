@@ -74,6 +74,7 @@ class Collector {
 
   broker::InstanceSink instances(const broker::Selection& selection) {
     return [this, detail = detailOf(operation_, selection)](const broker::Instance& instance) {
+      if (!mayRead(operation_, instance.path)) return true;
       text_ = "<VALUE.INSTANCEWITHPATH>";
       cimxml::appendWholePath(text_, instance.path, operation_.host.name());
       cimxml::appendInstance(text_, instance, detail);
@@ -84,6 +85,7 @@ class Collector {
 
   broker::PathSink paths() {
     return [this](const broker::ObjectPath& path) {
+      if (!mayRead(operation_, path)) return true;
       text_.clear();
       cimxml::appendWholePath(text_, path, operation_.host.name());
       return add();

@@ -58,9 +58,13 @@ void note(const std::string& line) {
   broker()->eft->logMessage(broker(), CMPI_SEV_INFO, nullptr, line.c_str(), nullptr);
 }
 
+/// What belongs to the thing "abroad" is in another namespace.
+std::string nameSpaceFor(const CMPIObjectPath* like) {
+  return nameOf(like) == "abroad" ? "root/other" : text(like->ft->getNameSpace(like, nullptr));
+}
+
 CMPIObjectPath* pathOf(const CMPIObjectPath* like, const char* className, const std::string& name) {
-  CMPIObjectPath* path =
-      broker()->eft->newObjectPath(broker(), text(like->ft->getNameSpace(like, nullptr)).c_str(), className, nullptr);
+  CMPIObjectPath* path = broker()->eft->newObjectPath(broker(), nameSpaceFor(like).c_str(), className, nullptr);
   path->ft->addKey(path, "name", reinterpret_cast<const CMPIValue*>(name.c_str()), CMPI_chars);
   return path;
 }
@@ -77,8 +81,7 @@ void setLabels(CMPIInstance* instance, const std::vector<std::string>& labels) {
 
 CMPIInstance* instanceOf(const CMPIObjectPath* like, const char* className, const std::string& name,
                          const char** properties) {
-  CMPIObjectPath* path =
-      broker()->eft->newObjectPath(broker(), text(like->ft->getNameSpace(like, nullptr)).c_str(), className, nullptr);
+  CMPIObjectPath* path = broker()->eft->newObjectPath(broker(), nameSpaceFor(like).c_str(), className, nullptr);
   CMPIInstance* instance = broker()->eft->newInstance(broker(), path, nullptr);
   const char* keys[] = {"Name", nullptr};
   instance->ft->setPropertyFilter(instance, properties, keys);

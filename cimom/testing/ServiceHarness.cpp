@@ -114,6 +114,7 @@ TestService::TestService(ServiceOptions options) {
   made.registry.add({"T_Trouble", "Trouble", library, InstanceMi});
   made.registry.add({"T_Absent", "Absent", "no-such-library", InstanceMi});
   made.registry.add({"T_ThingOther", "Link", library, InstanceMi | AssociationMi});
+  made.registry.addNameSpace("root/other");
   made.providerDirectory = ZORVA_LIB_DIR;
   made.log = log();
   broker_.emplace(broker::testing::testClasses(), std::move(made));
