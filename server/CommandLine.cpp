@@ -14,6 +14,7 @@ Examples:
   zorvacimd                                     serve as /etc/zorvagent/zorvacimd.toml says
   zorvacimd --port 0                            on a port that is free, and print it
   zorvacimd --listen ::1 --log-level 4500       on one address, with a log line for each request
+  zorvacimd --anonymous operate                 every user of this host may change settings
   zorvacimd --config my.toml --check-config     is that configuration good?
 
 It listens on loopback addresses only. SIGHUP reads the configuration again, SIGTERM ends it when the requests in work
@@ -32,6 +33,10 @@ void addOptions(CLI::App& app, CommandLine& line) {
                  "Log lines from this level on: 4500 each request, 5000 changes and what was refused (the default), "
                  "6000 errors")
       ->type_name("N");
+  app.add_option("--anonymous", line.anonymous,
+                 "What clients of this host may do without a login: read (the default), operate or none")
+      ->type_name("ROLE")
+      ->check(CLI::IsMember({"read", "operate", "none"}));
   app.add_option("--agent-config", line.agentConfig,
                  "The agent's configuration (default: $ZORVAGENT_CONFIG, else /etc/zorvagent/agent.toml)")
       ->type_name("FILE");
@@ -68,6 +73,7 @@ Config configOf(const CommandLine& line) {
   if (line.addresses.has_value()) config.addresses = line.addresses;
   if (line.port.has_value()) config.port = *line.port;
   if (line.logLevel.has_value()) config.logLevel = *line.logLevel;
+  if (line.anonymous.has_value()) config.access.anonymous = access::roleOf(*line.anonymous).value();
   if (!line.agentConfig.empty()) config.agentConfig = absolute(line.agentConfig);
   if (!line.providerDirectory.empty()) config.providerDirectory = absolute(line.providerDirectory);
   if (config.addresses.has_value()) http::checkAddresses(*config.addresses);

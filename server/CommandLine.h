@@ -15,6 +15,7 @@ struct CommandLine {
   std::optional<http::Addresses> addresses;
   std::optional<int> port;
   std::optional<int> logLevel;
+  std::optional<std::string> anonymous;  ///< the word of a role
   std::string agentConfig;
   std::string providerDirectory;
   bool checkConfig = false;  ///< read the configuration, report whether it is valid, and end

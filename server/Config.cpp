@@ -96,6 +96,28 @@ void readAudit(Config& config, const util::TomlDocument& document) {
   config.auditFile = util::pathFrom(config.file, config.auditFile);
 }
 
+/// A key whose value is the word of a role.
+void takeRole(util::TomlTable& table, const char* key, access::Role& role, access::Role most) {
+  std::string word(access::wordOf(role));
+  table.take(key, word);
+  const auto taken = access::roleOf(word);
+  if (!taken || *taken > most) {
+    table.fail(
+        key, most == access::Role::Operate ? R"(must be "read", "operate" or "none")" : R"(must be "read" or "none")");
+  }
+  role = *taken;
+}
+
+void readAccess(Config& config, const util::TomlDocument& document) {
+  util::TomlTable table(document, "access");
+  table.take("users", config.access.usersFile);
+  takeRole(table, "anonymous", config.access.anonymous, access::Role::Operate);
+  table.take("group", config.access.group);
+  takeRole(table, "socket", config.access.otherLocal, access::Role::Read);
+  table.finish();
+  config.access.usersFile = util::pathFrom(config.file, config.access.usersFile);
+}
+
 void readLog(Config& config, const util::TomlDocument& document) {
   util::TomlTable log(document, "log");
   log.take("level", config.logLevel, 0, 100'000);
@@ -121,7 +143,7 @@ std::string contentsOf(const std::string& path) {
 
 Config parseConfig(const std::string& path, const std::string& text) try {
   const util::TomlDocument document(text);
-  document.refuseAllBut({"listen", "limits", "http", "pull", "agent", "audit", "log"});
+  document.refuseAllBut({"listen", "limits", "http", "pull", "agent", "access", "audit", "log"});
   Config config;
   config.file = path;
   readListen(config, document);
@@ -129,6 +151,7 @@ Config parseConfig(const std::string& path, const std::string& text) try {
   readHttp(config, document);
   readPull(config, document);
   readAgent(config, document);
+  readAccess(config, document);
   readAudit(config, document);
   readLog(config, document);
   return config;

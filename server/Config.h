@@ -7,6 +7,7 @@
 #include <string>
 #include <vector>
 
+#include "access/LoginGate.h"
 #include "agent/config/Config.h"
 #include "http/HttpLimits.h"
 #include "http/Listener.h"
@@ -39,6 +40,9 @@ struct Config {
   /// [agent]
   std::string agentConfig;        ///< the agent's own configuration file; empty: the agent's default
   std::string providerDirectory;  ///< empty: beside the program
+
+  /// [access]
+  access::LoginOptions access;
 
   /// [audit]
   std::string auditFile;  ///< empty: the audit's lines are in the log

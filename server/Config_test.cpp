@@ -68,6 +68,11 @@ memory_mib = 7
 [agent]
 config = "agent.toml"
 provider_dir = "/lib/providers"
+[access]
+users = "users"
+anonymous = "none"
+group = "staff"
+socket = "none"
 [log]
 level = 4500
 target = "server.log"
@@ -95,6 +100,10 @@ target = "server.log"
   EXPECT_EQ(config.pullMebibytes, 7);
   EXPECT_EQ(config.agentConfig, directory_ / "agent.toml");
   EXPECT_EQ(config.providerDirectory, "/lib/providers");
+  EXPECT_EQ(config.access.usersFile, directory_ / "users");
+  EXPECT_EQ(config.access.anonymous, access::Role::None);
+  EXPECT_EQ(config.access.group, "staff");
+  EXPECT_EQ(config.access.otherLocal, access::Role::None);
   EXPECT_EQ(config.logLevel, 4500);
   EXPECT_EQ(config.logTarget, directory_ / "server.log");
 }
@@ -113,7 +122,7 @@ TEST_F(ServerConfig, TheExampleHasEveryKeyWithItsDefault) {
     text += line.substr(2) + "\n";
     ++keys;
   }
-  EXPECT_EQ(keys, 25U);
+  EXPECT_EQ(keys, 29U);
   const Config config = read(text);
   const Config defaults;
   EXPECT_EQ(config.port, defaults.port);
@@ -136,6 +145,10 @@ TEST_F(ServerConfig, TheExampleHasEveryKeyWithItsDefault) {
   EXPECT_EQ(config.pullSeconds, defaults.pullSeconds);
   EXPECT_EQ(config.pullLongestSeconds, defaults.pullLongestSeconds);
   EXPECT_EQ(config.pullMebibytes, defaults.pullMebibytes);
+  EXPECT_EQ(config.access.usersFile, defaults.access.usersFile);
+  EXPECT_EQ(config.access.anonymous, defaults.access.anonymous);
+  EXPECT_EQ(config.access.group, defaults.access.group);
+  EXPECT_EQ(config.access.otherLocal, defaults.access.otherLocal);
   EXPECT_EQ(config.logLevel, defaults.logLevel);
 }
 
@@ -152,6 +165,9 @@ TEST_F(ServerConfig, AnErrorNamesFileLineAndKey) {
             "zorvacimd.toml:2: limits.arrival_seconds: must be from 1 to 86400");
   EXPECT_EQ(wrong("[pull]\ndefault_seconds = 9\nlongest_seconds = 8\n"),
             "zorvacimd.toml:2: pull.default_seconds: must not be more than pull.longest_seconds");
+  EXPECT_EQ(wrong("[access]\nanonymous = \"all\"\n"),
+            "zorvacimd.toml:2: access.anonymous: must be \"read\", \"operate\" or \"none\"");
+  EXPECT_EQ(wrong("[access]\nsocket = \"operate\"\n"), "zorvacimd.toml:2: access.socket: must be \"read\" or \"none\"");
   EXPECT_THAT(wrong("[listen\n"), ::testing::StartsWith("zorvacimd.toml:1: "));
 }
 
@@ -163,12 +179,13 @@ TEST_F(ServerConfig, WhatIsNoFileIsAnErrorAndNoWait) {
 TEST_F(ServerConfig, TheCommandLineHoldsOverTheFile) {
   directory_.write("zorvacimd.toml", "[listen]\nport = 1\n[log]\nlevel = 2\n");
   const std::string file = directory_ / "zorvacimd.toml";
-  const char* words[] = {"zorvacimd", "--config", file.c_str(), "--port",   "7",
-                         "--listen",  "::1",      "--listen",   "127.0.0.3"};
+  const char* words[] = {"zorvacimd", "--config", file.c_str(), "--port",      "7",      "--listen",
+                         "::1",       "--listen", "127.0.0.3",  "--anonymous", "operate"};
   const auto line = readCommandLine(static_cast<int>(std::size(words)), words);
   const Config config = configOf(std::get<CommandLine>(line));
   EXPECT_EQ(config.port, 7);
   EXPECT_EQ(config.logLevel, 2);
+  EXPECT_EQ(config.access.anonymous, access::Role::Operate);
   EXPECT_THAT(config.addresses.value(), ElementsAre("::1", "127.0.0.3"));
 }
 

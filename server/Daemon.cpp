@@ -20,6 +20,7 @@
 #include <utility>
 #include <vector>
 
+#include "access/LoginGate.h"
 #include "agent/Agent.h"
 #include "cimom/Interop.h"
 #include "cimom/Service.h"
@@ -93,6 +94,18 @@ cimom::ServiceOptions serviceOptions(const Config& config) {
   return options;
 }
 
+std::shared_ptr<access::LoginGate> makeGate(const Config& config) {
+  access::LoginServices services;
+  services.log = [](const std::string& line) { ZORVA_LOG_CLIENT(Warning, line); };
+  return std::make_shared<access::LoginGate>(config.access, std::move(services));
+}
+
+/// Whoever starts the server should know it.
+void warnOfOpenAccess(const Config& config) {
+  if (config.access.anonymous != access::Role::Operate) return;
+  ZORVA_LOG(Warning, "access.anonymous is \"operate\": every user of this host may change settings without a login");
+}
+
 /// If a process was killed during a change, the next holder of the lock undoes the unfinished part.
 void mendSettings() noexcept {
   try {
@@ -140,6 +153,7 @@ class Daemon {
   std::vector<http::Listener> listeners_;
   std::unique_ptr<broker::Broker> broker_;
   std::unique_ptr<cimom::Service> service_;
+  std::shared_ptr<access::LoginGate> gate_;
   std::unique_ptr<http::HttpServer> server_;
   Clock::time_point acceptAgain_{};
   std::size_t requestsSeen_ = 0;     ///< at the last look
@@ -163,12 +177,14 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
   cimom::ServiceOptions options = serviceOptions(config_);
   options.audit = [this](const access::AuditRecord& record) { audit_->take(record); };
   service_ = std::make_unique<cimom::Service>(*broker_, std::move(options));
+  gate_ = makeGate(config_);
+  warnOfOpenAccess(config_);
   server_ = std::make_unique<http::HttpServer>(
       config_.limits, config_.threads,
       [service = service_.get()](const http::HttpRequest& request, http::ResponseSink& sink) {
         service->handle(request, sink);
       },
-      pageText(shortUrl(listeners_.front().url)));
+      pageText(shortUrl(listeners_.front().url)), gate_);
 }
 
 void Daemon::greet() const {
@@ -181,6 +197,10 @@ void Daemon::greet() const {
     const std::string url = shortUrl(listeners_.front().url);
     text += "ask it:  wbemcli ein " + url + "/root/cimv2:ZORVA_DNSProtocolEndPoint\n";
     text += "    or:  zorvactl --url " + url + "/root/cimv2 show\n";
+    if (config_.access.anonymous == access::Role::Read) {
+      text +=
+          "It shows everything and changes nothing; with --anonymous operate every user of this host may change it.\n";
+    }
   }
   std::fputs(text.c_str(), stdout);
   std::fflush(stdout);
@@ -240,6 +260,8 @@ void Daemon::reload() try {
   zorva::agent::loadConfig(fresh.agentConfig);
   applyLog(fresh);
   audit_->setWriter(auditWriter(fresh));
+  gate_->setOptions(fresh.access);
+  warnOfOpenAccess(fresh);
   makeRoomForConnections(fresh.limits);
   server_->setLimits(fresh.limits);
   if (fresh.addresses != config_.addresses || fresh.port != config_.port || fresh.threads != config_.threads ||
@@ -258,6 +280,7 @@ void Daemon::reload() try {
 void Daemon::lookAfter() {
   server_->sweep();
   service_->reclaim();
+  gate_->refresh();
   const std::size_t requests = server_->requestsTaken();
   if (requests != requestsSeen_ || server_->hasWork()) {
     requestsSeen_ = requests;
@@ -298,21 +321,23 @@ void tryProviders(const Config& config, const MakeBroker& makeBroker, std::vecto
   for (std::string& each : makeBroker(config)->openLibraries()) problems.push_back(std::move(each));
 }
 
+template <typename Step>
+void attempt(std::vector<std::string>& problems, const std::string& what, Step&& step) {
+  try {
+    step();
+  } catch (const std::exception& error) {
+    problems.push_back(what + error.what());
+  }
+}
+
 /// Reads and opens what a start would, and reports all errors.
 int check(const Config& config, const MakeBroker& makeBroker) {
   zorva::agent::loadConfig(config.agentConfig);
   std::vector<std::string> problems;
-  try {
-    tryLog(config);
-  } catch (const std::exception& error) {
-    problems.push_back(std::string("log.target: ") + error.what());
-  }
-  try {
-    auditWriter(config);
-  } catch (const std::exception& error) {
-    problems.push_back(std::string("audit.file: ") + error.what());
-  }
+  attempt(problems, "log.target: ", [&] { tryLog(config); });
+  attempt(problems, "audit.file: ", [&] { auditWriter(config); });
   tryProviders(config, makeBroker, problems);
+  attempt(problems, "access.users: ", [&] { makeGate(config); });
   for (const std::string& each : problems) tellError(each);
   if (!problems.empty()) return kCannotServe;
   std::printf("%s: good\n", config.file.empty() ? "the built-in configuration" : config.file.c_str());
