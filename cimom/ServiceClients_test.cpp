@@ -80,7 +80,8 @@ class Server : util::NotCopied {
     if (process_ == 0) {
       dup2(ends[1], STDOUT_FILENO);
       execl(ZORVA_BIN_DIR "/zorvacimd", "zorvacimd", "--port", "0", "--listen", "127.0.0.1", "--config",
-            (directory_ / "server.toml").c_str(), "--agent-config", (directory_ / "agent.toml").c_str(), nullptr);
+            (directory_ / "server.toml").c_str(), "--agent-config", (directory_ / "agent.toml").c_str(), "--anonymous",
+            "operate", nullptr);
       _exit(127);
     }
     close(ends[1]);

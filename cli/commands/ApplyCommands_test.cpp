@@ -237,7 +237,8 @@ void expectOfEachOwner(bool (*work)(const Owner& owner)) {
 }
 
 constexpr const char* kServer = ZORVA_BIN_DIR
-    "/zorvacimd --config /run/zorvacimd.toml --agent-config /etc/zorvagent/agent.toml --listen 127.0.0.1 --port 5988 ";
+    "/zorvacimd --config /run/zorvacimd.toml --agent-config /etc/zorvagent/agent.toml --listen 127.0.0.1 --port 5988 "
+    "--anonymous operate ";
 std::string modify(const std::string& server) {
   return outputOf(std::string(kZorvactl).substr(0, std::string(kZorvactl).find(' ')) +
                   " --url http://127.0.0.1:5988 dns set eth0 " + server + "; echo \"[$?]\"");

@@ -69,7 +69,7 @@ TestServer::TestServer(const TestHost& host) {
     ::prctl(PR_SET_PDEATHSIG, SIGTERM);
     ::dup2(ends[1], STDOUT_FILENO);
     ::execl(ZORVA_BIN_DIR "/zorvacimd", "zorvacimd", "--config", config.c_str(), "--agent-config", agent.c_str(),
-            "--listen", "127.0.0.1", "--port", "0", "--log-level", "9999", nullptr);
+            "--listen", "127.0.0.1", "--port", "0", "--log-level", "9999", "--anonymous", "operate", nullptr);
     ::_exit(127);
   }
   ::close(ends[1]);
