@@ -7,7 +7,7 @@ void addCommands(CommandLine& line) {
   for (const auto add :
        {addShowCommand, addCheckCommand, addTreeCommand, addClassesCommand, addGraphCommand, addReadCommands,
         addAssociationCommands, addModifyCommand, addInvokeCommand, addIfcfgCommands, addDnsCommands, addDomainCommand,
-        addSuffixesCommands, addOverlayCommands, addApplyCommands, addCompletionCommands}) {
+        addSuffixesCommands, addOverlayCommands, addApplyCommands, addUserCommands, addCompletionCommands}) {
     add(line);
   }
 }

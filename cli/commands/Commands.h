@@ -25,6 +25,7 @@ void addDomainCommand(CommandLine& line);
 void addSuffixesCommands(CommandLine& line);
 void addOverlayCommands(CommandLine& line);
 void addApplyCommands(CommandLine& line);
+void addUserCommands(CommandLine& line);
 void addCompletionCommands(CommandLine& line);
 
 }  // namespace zorva::cli

@@ -225,6 +225,20 @@ std::string graphJson(const Graph& graph) {
   return dumped(json);
 }
 
+std::string usersJson(const std::vector<const access::User*>& users) {
+  return dumped(ofRows(users, [](const access::User* user) {
+    Json entry;
+    entry["name"] = user->name;
+    entry["role"] = access::wordOf(user->grants.everywhere());
+    entry["namespaces"] = Json::object();
+    for (const auto& [name, role] : user->grants.byNameSpace()) entry["namespaces"][name] = access::wordOf(role);
+    entry["has_password"] = user->hash != access::kNoPassword;
+    entry["fingerprints"] = ofTexts(user->fingerprints);
+    entry["subject"] = orNull(user->subject);
+    return entry;
+  }));
+}
+
 std::string classRowsJson(const std::vector<ClassRow>& rows) { return dumped(ofClassRows(rows)); }
 
 }  // namespace zorva::cli

@@ -6,6 +6,7 @@
 #include <string>
 #include <vector>
 
+#include "access/Users.h"
 #include "agent/apply/Apply.h"
 #include "cli/commands/Graph.h"
 #include "cli/output/TreeText.h"
@@ -43,6 +44,10 @@ std::string graphJson(const Graph& graph);
 
 /// The result of `check`: "question", "servers", "suffixes", "problems".
 std::string checkJson(const CheckResult& result);
+
+/// The users of the server: "name", "role", "namespaces" with the role in each, "has_password", "fingerprints" and
+/// "subject".
+std::string usersJson(const std::vector<const access::User*>& users);
 
 /// The rows of `classes`.
 std::string classRowsJson(const std::vector<ClassRow>& rows);

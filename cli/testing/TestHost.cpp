@@ -78,8 +78,8 @@ int exitCodeOf(pid_t child) {
   return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
 }
 
-[[noreturn]] void become(const std::vector<std::string>& words, int out, int err) {
-  ::dup2(::open("/dev/null", O_RDONLY), STDIN_FILENO);
+[[noreturn]] void become(const std::vector<std::string>& words, int in, int out, int err) {
+  ::dup2(in, STDIN_FILENO);
   ::dup2(out, STDOUT_FILENO);
   ::dup2(err, STDERR_FILENO);
   std::vector<char*> arguments;
@@ -144,6 +144,10 @@ Outcome TestHost::runWith(const std::vector<std::pair<std::string, std::string>>
   return runPrepared([] { return true; }, environment, words, output);
 }
 
+Outcome TestHost::runWithInput(const std::string& input, const std::vector<std::string>& words) const {
+  return runPrepared([] { return true; }, {}, words, OutputTo::Pipe, input);
+}
+
 Outcome TestHost::runLimited(std::size_t bytes, AtLimit atLimit, const std::vector<std::string>& words) const {
   const auto limit = [&] {
     const rlimit size{bytes, bytes};
@@ -175,8 +179,11 @@ Outcome TestHost::runUnprivileged(const std::vector<std::string>& words) const {
 }
 
 Outcome TestHost::runPrepared(const std::function<bool()>& prepare, const Environment& environment,
-                              const std::vector<std::string>& words, OutputTo output) const {
+                              const std::vector<std::string>& words, OutputTo output, const std::string& input) const {
   const Pair out = makeOutput(output);
+  const Pair in = makePipe();
+  if (::write(in.writer, input.data(), input.size()) < 0) throw std::runtime_error("no input");
+  ::close(in.writer);
   const Pair err = output == OutputTo::ErrorTerminal ? makeTerminal() : makePipe();
   const pid_t child = ::fork();
   if (child < 0) throw std::runtime_error("no process");
@@ -186,8 +193,9 @@ Outcome TestHost::runPrepared(const std::function<bool()>& prepare, const Enviro
     ::unsetenv("NO_COLOR");
     for (const auto& [name, value] : environment) ::setenv(name.c_str(), value.c_str(), 1);
     if (!prepare()) ::_exit(127);
-    become(words, out.writer, err.writer);
+    become(words, in.reader, out.writer, err.writer);
   }
+  ::close(in.reader);
   ::close(out.writer);
   ::close(err.writer);
   Outcome outcome;

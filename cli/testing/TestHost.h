@@ -35,6 +35,9 @@ class TestHost {
   Outcome runWith(const std::vector<std::pair<std::string, std::string>>& environment,
                   const std::vector<std::string>& words, OutputTo output = OutputTo::Pipe) const;
 
+  /// Runs it with this standard input, of a few kilobytes at most.
+  Outcome runWithInput(const std::string& input, const std::vector<std::string>& words) const;
+
   /// If root runs the tests, runs it as a user who owns nothing here; else as the same user, with the host's
   /// directories closed to writing. Exit code 127: that user cannot run the program.
   Outcome runUnprivileged(const std::vector<std::string>& words) const;
@@ -62,7 +65,7 @@ class TestHost {
  private:
   using Environment = std::vector<std::pair<std::string, std::string>>;
   Outcome runPrepared(const std::function<bool()>& prepare, const Environment& environment,
-                      const std::vector<std::string>& words, OutputTo output) const;
+                      const std::vector<std::string>& words, OutputTo output, const std::string& input = {}) const;
 
   zorva::agent::testing::TemporaryDirectory directory_;
 };
