@@ -2,6 +2,7 @@
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include "agent/testing/TemporaryDirectory.h"
@@ -37,7 +38,8 @@ class CountingVerifier : public PasswordVerifier {
 class LoginGateTest : public ::testing::Test {
  protected:
   LoginGateTest() {
-    options_.usersFile = directory_.write("users", "alice:*:operate\n");
+    options_.usersFile = directory_ / "users";
+    writeUsers("alice:*:operate\n");
     services_.log = [this](const std::string& line) { lines_.push_back(line); };
     services_.now = [this] { return now_; };
     services_.passwords = verifier_;
@@ -49,6 +51,9 @@ class LoginGateTest : public ::testing::Test {
     network_.isEncrypted = true;
     network_.address = "192.0.2.7";
   }
+
+  /// Closed to other users, as zorvactl makes it.
+  void writeUsers(const std::string& text) const { ::chmod(directory_.write("users", text).c_str(), 0640); }
 
   LoginGate& gate() {
     if (!gate_) gate_ = std::make_unique<LoginGate>(options_, services_);
@@ -177,30 +182,30 @@ TEST_F(LoginGateTest, AKnownLoginIsTakenWhileOthersOfItsAddressGuess) {
 }
 
 TEST_F(LoginGateTest, AChangeOfTheFileCountsAtOnce) {
-  directory_.write("users", "alice:*:operate\nbob:*:read\n");
+  writeUsers("alice:*:operate\nbob:*:read\n");
   EXPECT_EQ(ask(network_, kAlice).kind, Kind::Admitted);
-  directory_.write("users", "# a comment\nalice:*:operate\nbob:*:read\n");
+  writeUsers("# a comment\nalice:*:operate\nbob:*:read\n");
   gate().refresh();
   EXPECT_EQ(ask(network_, kAlice).kind, Kind::Admitted);
   EXPECT_EQ(verifier_->count, 1) << "an entry that did not change is still remembered";
-  directory_.write("users", "alice:*:read\n");
+  writeUsers("alice:*:read\n");
   gate().refresh();
   EXPECT_EQ(roleIn(ask(network_, kAlice)), Role::Read);
   EXPECT_EQ(verifier_->count, 2);
-  directory_.write("users", "");
+  writeUsers("");
   gate().refresh();
   EXPECT_EQ(ask(network_, kAlice).kind, Kind::NeedsLogin);
 }
 
 TEST_F(LoginGateTest, ANewUserCanLogInAtOnce) {
   EXPECT_EQ(ask(network_, kNobody).kind, Kind::NeedsLogin);
-  directory_.write("users", "secret:*:read\n");
+  writeUsers("secret:*:read\n");
   now_ += seconds(1);
   EXPECT_EQ(ask(network_, kNobody).kind, Kind::Admitted);
 }
 
 TEST_F(LoginGateTest, ACertificateStandsForItsUser) {
-  directory_.write("users", "carol:*:read:root/cimv2=operate:subject=CN=carol\n");
+  writeUsers("carol:*:read:root/cimv2=operate:subject=CN=carol\n");
   network_.certificate = Certificate{"CN=carol", std::string(64, 'a')};
   const Decision decision = ask(network_);
   EXPECT_EQ(roleIn(decision), Role::Operate);
@@ -220,7 +225,7 @@ TEST_F(LoginGateTest, ACertificateOfNobodyNeedsALogin) {
 TEST_F(LoginGateTest, ACertificateThatWasJustAddedIsTaken) {
   network_.certificate = Certificate{"CN=carol", std::string(64, 'a')};
   EXPECT_EQ(ask(network_).kind, Kind::Refused);
-  directory_.write("users", "carol:*:read:fingerprint=" + std::string(64, 'a') + "\n");
+  writeUsers("carol:*:read:fingerprint=" + std::string(64, 'a') + "\n");
   EXPECT_EQ(ask(network_).kind, Kind::Admitted);
 }
 

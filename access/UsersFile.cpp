@@ -60,6 +60,11 @@ WatchedUsers::WatchedUsers(std::string path, std::function<void(const std::strin
     return;
   }
   users_ = std::make_shared<const Users>(readUsersFile(path_));
+  warnOfRights();
+}
+
+void WatchedUsers::warnOfRights() const {
+  if ((mark_.mode & S_IRWXO) != 0) log_(path_ + ": all users of this host may read it; its rights should be 0640");
 }
 
 WatchedUsers::Mark WatchedUsers::markOf(const std::string& path) {
@@ -81,6 +86,7 @@ WatchedUsers::Snapshot WatchedUsers::refresh() {
   mark_ = now;
   std::optional<Users> read = this->read();
   if (!read) return nullptr;
+  warnOfRights();
   auto fresh = std::make_shared<const Users>(std::move(*read));
   const std::lock_guard lock(mutex_);
   return std::exchange(users_, std::move(fresh));

@@ -45,6 +45,7 @@ class WatchedUsers : util::NotCopied {
   struct Mark;
   static Mark markOf(const std::string& path);
   std::optional<Users> read();
+  void warnOfRights() const;
 
   const std::string path_;
   const std::function<void(const std::string&)> log_;

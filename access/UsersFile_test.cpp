@@ -17,6 +17,10 @@ using ::testing::IsEmpty;
 class UsersFile : public ::testing::Test {
  protected:
   std::string path() const { return directory_ / "users"; }
+
+  /// Closed to other users, as zorvactl makes it.
+  void writeUsers(const std::string& text) const { ::chmod(directory_.write("users", text).c_str(), 0640); }
+
   mode_t mode() const {
     struct stat status {};
     ::stat(path().c_str(), &status);
@@ -69,10 +73,10 @@ TEST_F(UsersFile, IfItCannotBeWrittenTheOldOneStays) {
 }
 
 TEST_F(UsersFile, AChangeIsReadOnce) {
-  directory_.write("users", "bob:*:read\n");
+  writeUsers("bob:*:read\n");
   WatchedUsers users(path(), log());
   EXPECT_EQ(users.refresh(), nullptr);
-  directory_.write("users", "bob:*:read\nalice:*:read\n");
+  writeUsers("bob:*:read\nalice:*:read\n");
   const auto before = users.refresh();
   ASSERT_NE(before, nullptr);
   EXPECT_EQ(before->find("alice"), nullptr);
@@ -84,13 +88,20 @@ TEST_F(UsersFile, AChangeIsReadOnce) {
 }
 
 TEST_F(UsersFile, AFileThatBreaksLeavesTheUsersAndOneLine) {
-  directory_.write("users", "bob:*:read\n");
+  writeUsers("bob:*:read\n");
   WatchedUsers users(path(), log());
-  directory_.write("users", "bob:*:read\nalice\n");
+  writeUsers("bob:*:read\nalice\n");
   EXPECT_EQ(users.refresh(), nullptr);
   EXPECT_EQ(users.refresh(), nullptr);
   EXPECT_NE(users.users()->find("bob"), nullptr);
   EXPECT_THAT(lines_, ElementsAre(HasSubstr("the users stay as they were: " + path() + ":2: ")));
+}
+
+TEST_F(UsersFile, AFileThatAllMayReadLeavesALine) {
+  directory_.write("users", "bob:*:read\n");
+  ::chmod(path().c_str(), 0644);
+  const WatchedUsers users(path(), log());
+  EXPECT_THAT(lines_, ElementsAre(path() + ": all users of this host may read it; its rights should be 0640"));
 }
 
 TEST_F(UsersFile, AFileThatIsBrokenAtTheStartIsAnError) {

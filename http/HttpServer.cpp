@@ -197,9 +197,10 @@ bool HttpServer::Core::stop() {
   const auto waitUntil = [&](Clock::time_point deadline) {
     while (hasWork() && Clock::now() < deadline) std::this_thread::sleep_for(kStep);
   };
+  // A client that is not known yet has no request in work.
+  logins_.giveUpAll();
   waitUntil(Clock::now() + limits().drain);
   workers_.giveUpAll();
-  logins_.giveUpAll();
   waitUntil(Clock::now() + kLastAnswers);
   MHD_stop_daemon(std::exchange(daemon_, nullptr));
   const bool isLoginDone = logins_.join(kLastAnswers);

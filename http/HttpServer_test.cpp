@@ -13,6 +13,8 @@
 #include <mutex>
 #include <thread>
 
+#include "access/LoginGate.h"
+#include "agent/testing/TemporaryDirectory.h"
 #include "http/Listener.h"
 #include "http/RequestHead.h"
 #include "http/testing/TestWire.h"
@@ -712,6 +714,50 @@ TEST_F(HttpServerLogin, TheEndDoesNotWaitForALogin) {
   EXPECT_FALSE(server_.http().stop()) << "the gate is stuck";
   EXPECT_EQ(wire_.receive().status, 503);
   EXPECT_EQ(second.receive().status, 503);
+}
+
+/// The real gate, for connections that count as encrypted.
+class EncryptedGate final : public access::Gate {
+ public:
+  explicit EncryptedGate(const std::string& users) : gate_({.usersFile = users}) {}
+
+  access::Decision decide(const access::Origin& origin, const std::string* authorization) override {
+    return gate_.decide(encrypted(origin), authorization);
+  }
+  access::Decision verify(const access::Origin& origin, const std::string& authorization) override {
+    return gate_.verify(encrypted(origin), authorization);
+  }
+
+ private:
+  static access::Origin encrypted(access::Origin origin) {
+    origin.isEncrypted = true;
+    return origin;
+  }
+
+  access::LoginGate gate_;
+};
+
+TEST(HttpServerUsers, AUserLogsInAndWhoGuessesMustWait) {
+  const zorva::agent::testing::TemporaryDirectory directory;
+  const std::string users = directory.write("users", "alice:" + access::hashPassword("password") + ":operate\n");
+  Server server([](const HttpRequest& request, ResponseSink& sink) { answer(sink, request.who->user); }, {}, {},
+                std::make_shared<EncryptedGate>(users));
+  const auto responseTo = [&](const std::string& login) {
+    Wire wire(server.port());
+    EXPECT_TRUE(wire.send(testing::posting("x", "Authorization: Basic " + login + "\r\n")));
+    return wire.receive();
+  };
+  const char* right = "YWxpY2U6cGFzc3dvcmQ=";
+  const char* wrong = "YWxpY2U6d3Jvbmc=";
+  const char* other = "Ym9iOndyb25n";
+  EXPECT_EQ(responseTo(right).body, "alice");
+  Wire guessing(server.port());
+  ASSERT_TRUE(guessing.send(testing::posting("x", std::string("Authorization: Basic ") + wrong + "\r\n")));
+  EXPECT_EQ(guessing.take(1, milliseconds(200)), "") << "the answer is held back";
+  EXPECT_EQ(responseTo(right).body, "alice") << "a login that is remembered does not wait";
+  EXPECT_EQ(guessing.receive().status, 401);
+  EXPECT_EQ(responseTo(wrong).status, 401);
+  EXPECT_EQ(responseTo(other).status, 401);
 }
 
 }  // namespace
