@@ -7,6 +7,7 @@
 #include <thread>
 #include <utility>
 
+#include "agent/apply/NetworkManagerDevice.h"
 #include "agent/apply/NetworkManagerProfile.h"
 #include "agent/apply/SettingsText.h"
 #include "agent/apply/Writers.h"
@@ -17,24 +18,12 @@ namespace zorva::agent {
 namespace {
 
 using Family = NetworkManagerProfile::Family;
+using Device = NetworkManagerDevice;
 using Done = Expected<void, std::string>;
 
 constexpr const char* kSettingsPath = "/org/freedesktop/NetworkManager/Settings";
 constexpr const char* kSettings = "org.freedesktop.NetworkManager.Settings";
-constexpr const char* kActive = "org.freedesktop.NetworkManager.Connection.Active";
 constexpr const char* kLease = "org.freedesktop.NetworkManager.DHCP4Config";
-constexpr std::uint32_t kExternal = 0x80;  // NM_ACTIVATION_STATE_FLAG_EXTERNAL
-
-struct Device {
-  std::string path;
-  bool isManaged = false;
-  std::string active;   ///< the path of its active connection; "/" or empty for none
-  std::string profile;  ///< the path of that one's profile
-  bool isExternal = false;
-  std::string lease;  ///< the path of its lease of IPv4; "/" or empty for none
-};
-
-bool isPath(const std::string& path) { return path.size() > 1; }
 
 // The profile as an argument of nmcli that needs no quotes.
 std::string argumentFor(const NetworkManagerProfile& profile) {
@@ -130,7 +119,6 @@ class NetworkManagerWriter : public DnsWriter {
   };
 
   BusObject object(const std::string& path) const { return networkManagerObject(bus_, path); }
-  Expected<Device, std::string> deviceOf(const std::string& interface) const;
   Expected<Use, Refusal> useOf(const std::string& interface) const;
   Expected<NetworkManagerProfile, Refusal> changed(const NetworkManagerProfile& profile, const DnsTarget& target,
                                                    const DnsSettings& settings) const;
@@ -147,7 +135,7 @@ Refusal reasonAgainst(const std::string& interface, const Device& device) {
   if (!device.isManaged) {
     return interface + " is unmanaged by NetworkManager; 'nmcli device set " + interface + " managed yes' changes that";
   }
-  if (!isPath(device.profile)) {
+  if (!isBusPath(device.profile)) {
     return interface + ": no profile of NetworkManager is active; 'nmcli device connect " + interface +
            "' activates one";
   }
@@ -195,35 +183,9 @@ Refusal reasonAgainst(const std::string& interface, const NetworkManagerProfile&
          " auto' changes that";
 }
 
-Expected<Device, std::string> NetworkManagerWriter::deviceOf(const std::string& interface) const {
-  Device device;
-  Done done =
-      object(kNetworkManagerPath)
-          .call(
-              kNetworkManagerService, "GetDeviceByIpIface", [&](BusWriter& arguments) { arguments.text(interface); },
-              [&](BusReader& answer) { device.path = answer.text(); });
-  if (done) {
-    done = object(device.path).readProperties(kNetworkManagerDevice, [&](BusReader& reader, const std::string& name) {
-      if (name == "Managed") reader.ifVariant("b", [&] { device.isManaged = reader.flag(); });
-      if (name == "ActiveConnection") reader.ifPath(device.active);
-      if (name == "Dhcp4Config") reader.ifPath(device.lease);
-    });
-  }
-  if (done && isPath(device.active)) {
-    done = object(device.active).readProperties(kActive, [&](BusReader& reader, const std::string& name) {
-      if (name == "Connection") reader.ifPath(device.profile);
-      if (name == "StateFlags") {
-        reader.ifVariant("u", [&] { device.isExternal = (reader.number() & kExternal) != 0; });
-      }
-    });
-  }
-  if (!done) return unexpected(done.error());
-  return device;
-}
-
 Expected<NetworkManagerWriter::Use, Refusal> NetworkManagerWriter::useOf(const std::string& interface) const {
   const std::string shown = inOneLine(interface);
-  auto device = deviceOf(interface);
+  auto device = readDevice(bus_, interface);
   if (!device) return unexpected(shown + ": NetworkManager cannot be asked: " + device.error());
   if (Refusal reason = reasonAgainst(shown, *device); !reason.empty()) return unexpected(std::move(reason));
   auto profile = readProfile(bus_, device->profile);
@@ -293,7 +255,7 @@ Expected<NetworkManagerProfile, Refusal> NetworkManagerWriter::changed(const Net
 void NetworkManagerWriter::waitForLeaseToAge(const Device& device) const {
   using std::chrono::seconds;
   using std::chrono::system_clock;
-  if (!isPath(device.lease)) return;
+  if (!isBusPath(device.lease)) return;
   std::string end;
   std::string duration;
   (void)object(device.lease).readProperties(kLease, [&](BusReader& reader, const std::string& property) {
@@ -379,7 +341,7 @@ Expected<void, Refusal> NetworkManagerWriter::restore(const DnsTarget& target, c
   if (const Done done = putBack(before); !done) {
     return unexpected(where + "NetworkManager does not change " + nameOf(before) + ": " + done.error());
   }
-  const auto device = deviceOf(target.interface);
+  const auto device = readDevice(bus_, target.interface);
   if (!device || device->profile != *path) return {};
   if (const Done used = reapply(*device); !used) {
     return unexpected(where + "NetworkManager does not use " + nameOf(before) + " anew: " + used.error() +
