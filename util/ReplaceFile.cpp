@@ -1,8 +1,10 @@
 #include "util/ReplaceFile.h"
 
 #include <fcntl.h>
+#include <sys/xattr.h>
 #include <unistd.h>
 
+#include <array>
 #include <cerrno>
 #include <system_error>
 #include <utility>
@@ -39,6 +41,14 @@ void giveRights(const FileDescriptor& file, const struct stat& like) {
   ::fchmod(file.get(), like.st_mode & 0777U);
 }
 
+// With a new file's own SELinux label, programs might not read it in this place.
+void giveLabel(const FileDescriptor& file, const std::string& like) {
+  constexpr const char* kLabel = "security.selinux";
+  std::array<char, 4096> label{};
+  const ssize_t length = ::getxattr(like.c_str(), kLabel, label.data(), label.size());
+  if (length > 0) (void)!::fsetxattr(file.get(), kLabel, label.data(), static_cast<std::size_t>(length), 0);
+}
+
 }  // namespace
 
 std::string replaceFile(const std::string& directory, const std::string& name, const std::string& text,
@@ -51,6 +61,7 @@ std::string replaceFile(const std::string& directory, const std::string& name, c
     if (!file) throwFileError(temporary.path(), "cannot be opened");
     if (like != nullptr) {
       giveRights(file, *like);
+      giveLabel(file, target);
     } else {
       giveToOwnerOfDirectory(file, temporary.path());
     }

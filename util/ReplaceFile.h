@@ -12,9 +12,9 @@
 namespace zorva::util {
 
 /// Replaces directory + name by a file with that text, with a synced temporary file beside it. One writer at a time:
-/// the caller holds a lock. The file gets the owner and the rights of `like`, or those that suit its directory (see
-/// rightsIn and giveToOwnerOfDirectory), as far as possible. Throws std::runtime_error, with one line; the old file is
-/// then unchanged.
+/// the caller holds a lock. The file gets the owner and the rights of `like` and the SELinux label of the old file, or
+/// the owner and the rights that suit its directory (see rightsIn and giveToOwnerOfDirectory), as far as possible.
+/// Throws std::runtime_error, with one line; the old file is then unchanged.
 [[nodiscard]] std::string replaceFile(const std::string& directory, const std::string& name, const std::string& text,
                                       const struct stat* like = nullptr);
 

@@ -1,7 +1,10 @@
 // Changes of a plain /etc/resolv.conf.
 #include <gtest/gtest.h>
 #include <sys/mount.h>
+#include <sys/xattr.h>
 #include <unistd.h>
+
+#include <algorithm>
 
 #include "agent/apply/testing/ApplyHost.h"
 #include "agent/testing/DnsListeners.h"
@@ -173,6 +176,23 @@ TEST(ResolvConfChange, FollowsALinkToAPlainFile) {
     host.apply();
     EXPECT_TRUE(std::filesystem::is_symlink(kFile));
     EXPECT_NE(contentsOf("/etc/net/mine").find("nameserver 192.0.2.1\n"), std::string::npos);
+  }));
+}
+
+TEST(ResolvConfChange, KeepsRightsAndTheSecurityLabel) {
+  ZORVAGENT_NEEDS_PRIVATE_HOST();
+  EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
+    const std::string label = "system_u:object_r:net_conf_t:s0";
+    if (::setxattr(kFile, "security.selinux", label.data(), label.size(), 0) != 0) return;  // not every file system
+    outputOf("chmod 640 /etc/resolv.conf; chown 1:2 /etc/resolv.conf");
+    host.want("eth0", "DNSSERVERS=192.0.2.1\n");
+    host.apply();
+    EXPECT_NE(contentsOf(kFile), kBefore);
+    std::string now(label.size() + 1, ' ');
+    now.resize(
+        static_cast<std::size_t>(std::max(::getxattr(kFile, "security.selinux", now.data(), now.size()), ssize_t{0})));
+    EXPECT_EQ(now, label);
+    EXPECT_EQ(outputOf("stat -c '%a %u %g' /etc/resolv.conf"), "640 1 2\n");
   }));
 }
 
