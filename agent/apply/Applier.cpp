@@ -21,6 +21,7 @@ using namespace ZV::NodeLexicon;
 using std::chrono::system_clock;
 
 constexpr const char* kNetworkdOwner = "systemd-networkd";
+constexpr const char* kResolvedOwner = "systemd-resolved";
 
 util::FileDescriptor openLock(const std::string& path) {
   constexpr mode_t kRights = 0600;
@@ -254,16 +255,24 @@ void Applier::execute(Plan& plan) {
     return;
   }
   plan.result.problem = written ? notTaken(plan) : written.error();
-  if (written) {
-    const auto restored = writer.restore(plan.target, plan.saved);
-    if (!restored) {
-      plan.result.problem += "; and " + plan.interface.name + " could not be put back: " + restored.error();
-      return;
-    }
-    plan.result.problem += "; " + plan.interface.name + " is as it was before";
-  }
+  if (written ? !putBack(plan) : !isAsBefore(plan)) return;
   state_ = before;
   file_.write(state_);
+}
+
+bool Applier::putBack(Plan& plan) {
+  const auto restored = host_.writerOf(plan.result.owner)->restore(plan.target, plan.saved);
+  plan.result.problem += restored ? "; " + plan.interface.name + " is as it was before"
+                                  : "; and " + plan.interface.name + " could not be put back: " + restored.error();
+  return restored.has_value();
+}
+
+// An owner that ended in the middle may have the new settings, on the disk or in use.
+bool Applier::isAsBefore(Plan& plan) {
+  const auto now = host_.writerOf(plan.result.owner)->save(plan.target);
+  if (now && *now == plan.saved && host_.waitUntilShown(plan.target, plan.result.owner, plan.before.lists)) return true;
+  plan.result.problem += "; 'zorvactl revert " + plan.interface.name + "' takes back what may have been changed";
+  return false;
 }
 
 // What is host-wide was saved at the first change for any interface.
@@ -345,6 +354,7 @@ ApplyResult Applier::revertOne(const HostInterface& interface, bool dryRun) {
     result.profile = one.profile;
     result.changes.insert(result.changes.end(), one.changes.begin(), one.changes.end());
     if (!one.problem.empty()) result.problem += (result.problem.empty() ? "" : "; ") + one.problem;
+    if (!one.note.empty()) result.note += (result.note.empty() ? "" : "; ") + one.note;
     if (dryRun || !one.problem.empty()) continue;
     forget(entry);
     holdBack(entry.interface);
@@ -366,16 +376,21 @@ ApplyResult Applier::restore(const SavedDns& saved, bool dryRun) {
   result.interface = saved.interface;
   result.owner = saved.owner;
   result.profile = saved.profile;
-  const HostInterface interface = host_.interface(saved.interface);
-  const DnsTarget target = host_.targetFor(interface, saved.profile);
   DnsWriter* writer = host_.writerOf(saved.owner);
   if (writer == nullptr) {
     result.problem = inOneLine(saved.owner) + " had " + saved.interface + " and cannot be changed from here";
     return result;
   }
+  const HostInterface interface = host_.interface(saved.interface);
+  const std::string otherOwner = otherOwnerThan(saved, interface);
+  const DnsTarget target = host_.targetFor(interface, saved.profile);
   const ShownDns before = host_.shown(interface, saved.owner);
   if (dryRun) {
-    result.changes = differences(before, saved.shown);
+    if (otherOwner.empty()) result.changes = differences(before, saved.shown);
+    return result;
+  }
+  if (!otherOwner.empty()) {
+    restoreElsewhere(result, saved, target, otherOwner);
     return result;
   }
   if (const auto restored = writer->restore(target, saved.saved); !restored) {
@@ -389,6 +404,37 @@ ApplyResult Applier::restore(const SavedDns& saved, bool dryRun) {
   result.changes = differences(before, after);
   if (!isShown && before == after) result.problem = saved.owner + " still has the settings of before";
   return result;
+}
+
+// Who has the interface instead of the owner, or of the profile, whose settings were saved. Empty where that is the
+// same, or is not known.
+std::string Applier::otherOwnerThan(const SavedDns& saved, const HostInterface& interface) {
+  if (!interface.exists()) return {};
+  const auto owner = host_.ownerOf(interface);
+  if (!owner || (owner->name == saved.owner && owner->profile == saved.profile)) return {};
+  return owner->profile.empty() ? owner->name : owner->name + " (" + inOneLine(owner->profile) + ")";
+}
+
+// What is left of the change where another owner has the interface now. Nothing of it is shown. systemd-resolved has
+// what that owner gives it, which must stay.
+void Applier::restoreElsewhere(ApplyResult& result, const SavedDns& saved, const DnsTarget& target,
+                               const std::string& otherOwner) {
+  result.note = otherOwner + " has " + saved.interface + " now; ";
+  if (saved.owner == kResolvedOwner) {
+    result.note += "nothing is left of what " + saved.owner + " was given";
+    return;
+  }
+  DnsWriter& writer = *host_.writerOf(saved.owner);
+  const auto restored = writer.restore(target, saved.saved);
+  const auto now = restored ? Expected<std::string, Refusal>(saved.saved) : writer.save(target);
+  const bool isOver = now ? *now == saved.saved : saved.owner == kResolvConfOwner;
+  if (!isOver) {
+    result.note.clear();
+    result.problem = restored.error();
+    return;
+  }
+  result.note += now ? saved.owner + " has its settings of before, which are not in use"
+                     : saved.owner + " is left as it is: " + now.error();
 }
 
 SavedDns Applier::saveNow(const SavedDns& entry) {

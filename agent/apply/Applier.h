@@ -49,12 +49,17 @@ class Applier {
   void planSuffixes(Plan& plan, const WantedSettings& wanted, const std::string& ownDomain) const;
   void refuseSharedStores(std::vector<Plan>& plans) const;
   void execute(Plan& plan);
+  bool putBack(Plan& plan);
+  bool isAsBefore(Plan& plan);
   void remember(const Plan& plan);
   std::string notTaken(const Plan& plan);
 
   std::vector<SavedDns> entriesOf(const std::string& interface) const;
   ApplyResult revertOne(const HostInterface& interface, bool dryRun);
   ApplyResult restore(const SavedDns& saved, bool dryRun);
+  std::string otherOwnerThan(const SavedDns& saved, const HostInterface& interface);
+  void restoreElsewhere(ApplyResult& result, const SavedDns& saved, const DnsTarget& target,
+                        const std::string& otherOwner);
   void forget(const SavedDns& saved);
   SavedDns saveNow(const SavedDns& entry);
 

@@ -50,6 +50,35 @@ void HostDns::look() {
   tree_ = look_();
 }
 
+bool HostDns::mayLookAgain() {
+  constexpr std::chrono::seconds kLongest{10};
+  constexpr std::chrono::milliseconds kPause{50};
+  if (!looksUntil_) looksUntil_ = steady_clock::now() + kLongest;
+  if (steady_clock::now() >= *looksUntil_) return false;
+  std::this_thread::sleep_for(kPause);
+  look();
+  return true;
+}
+
+// The tree is read after the owners are asked, and one of them may have ended in between.
+bool HostDns::isInTree(const ChosenOwner& owner, const HostInterface& interface) const {
+  const Node* node = nodeOf(interface);
+  return !owner.speaks || node == nullptr || textOf(*node, kDnsOwner) == owner.name;
+}
+
+Expected<ChosenOwner, Refusal> HostDns::ownerOf(const HostInterface& interface) {
+  for (;;) {
+    auto owner = choice_.choose(interface.link);
+    const auto doubt = choice_.doubtAbout(interface.link);
+    if (!doubt && (!owner || isInTree(*owner, interface))) return owner;
+    if (doubt && doubt->kind == OwnerDoubt::Kind::Stopped) return unexpected(doubt->refusal);
+    if (mayLookAgain()) continue;
+    if (doubt && doubt->kind == OwnerDoubt::Kind::Starting) return unexpected(doubt->refusal);
+    if (doubt) return owner;
+    return unexpected(owner->name + " answers too late to change " + interface.name + "; try again when it does not");
+  }
+}
+
 HostInterface HostDns::interfaceOf(const std::string& name, const std::string& path) const {
   const auto link = links_.find(name);
   return {name, path, link == links_.end() ? Link() : link->second};

@@ -6,6 +6,7 @@
 #include <functional>
 #include <map>
 #include <memory>
+#include <optional>
 #include <string>
 #include <unordered_map>
 #include <vector>
@@ -45,7 +46,8 @@ class HostDns {
   std::vector<HostInterface> interfaces() const;
   HostInterface interface(const std::string& name) const;
 
-  Expected<ChosenOwner, Refusal> ownerOf(const HostInterface& interface) { return choice_.choose(interface.link); }
+  /// Looks again while an owner starts or stops that may have the interface, for 10 s at most in the life of this.
+  Expected<ChosenOwner, Refusal> ownerOf(const HostInterface& interface);
 
   /// The other interfaces that would be changed as well.
   std::vector<std::string> othersWith(const ChosenOwner& owner, const HostInterface& interface) const;
@@ -66,6 +68,8 @@ class HostDns {
   bool waitUntilShown(const DnsTarget& target, const std::string& owner, const DnsSettings& lists);
 
  private:
+  bool mayLookAgain();
+  bool isInTree(const ChosenOwner& owner, const HostInterface& interface) const;
   HostInterface interfaceOf(const std::string& name, const std::string& path) const;
   const Node* nodeOf(const HostInterface& interface) const;
 
@@ -76,6 +80,7 @@ class HostDns {
   std::shared_ptr<const TreeSnapshot> tree_;
   std::unordered_map<std::string, Link> links_;  ///< by name
   std::map<std::string, std::unique_ptr<DnsWriter>> writers_;
+  std::optional<std::chrono::steady_clock::time_point> looksUntil_;  ///< for an owner that starts or stops
 };
 
 /// Whether two lists are the same, names in any case.

@@ -5,16 +5,23 @@
 #include <chrono>
 #include <thread>
 
-#include "agent/sources/BusNames.h"
+#include "agent/apply/NetworkManagerDevice.h"
 
 namespace zorva::agent {
-OwnerChoice::OwnerChoice(BusCalls& bus, const std::string& root) : bus_(bus), owners_(root) {}
+namespace {
+
+bool isLoopback(const Link& link) { return (link.flags & IFF_LOOPBACK) != 0; }
+
+}  // namespace
+
+OwnerChoice::OwnerChoice(BusCalls& bus, const std::string& root) : bus_(bus), owners_(root), doubts_(bus, root) {}
 
 void OwnerChoice::look(const std::vector<Link>& links) {
   constexpr std::chrono::seconds kLongest{10};
   constexpr std::chrono::milliseconds kPause{20};
   const auto deadline = std::chrono::steady_clock::now() + kLongest;
   links_ = links;
+  owners_.reopen();
   owners_.look(links_);
   while (!owners_.whoIsLate().empty() && std::chrono::steady_clock::now() < deadline) {
     std::this_thread::sleep_for(kPause);
@@ -23,7 +30,7 @@ void OwnerChoice::look(const std::vector<Link>& links) {
 }
 
 Expected<ChosenOwner, Refusal> OwnerChoice::choose(const Link& link) {
-  if ((link.flags & IFF_LOOPBACK) != 0) {
+  if (isLoopback(link)) {
     return unexpected(link.name + " is the loopback interface, which has no DNS settings of its own");
   }
   if (const std::string late = owners_.whoIsLate(); !late.empty()) {
@@ -31,31 +38,33 @@ Expected<ChosenOwner, Refusal> OwnerChoice::choose(const Link& link) {
                       " is not known; try again when it does, or stop it");
   }
   const DnsFacts facts = owners_.factsOf(link);
-  if (!facts.owner.empty()) return ChosenOwner{facts.owner, facts.profile};
+  if (!facts.owner.empty()) return ChosenOwner{facts.owner, facts.profile, facts.saysAnything()};
   if (const auto managed = refuseUnmanaged(link); !managed) return unexpected(managed.error());
-  if (owners_.hostFacts() != nullptr) return ChosenOwner{"systemd-resolved", {}};
-  if (!owners_.speakForAny(links_)) return ChosenOwner{"/etc/resolv.conf", {}};
+  if (owners_.hostFacts() != nullptr) return ChosenOwner{"systemd-resolved", {}, false};
+  if (!owners_.speakForAny(links_)) return ChosenOwner{"/etc/resolv.conf", {}, false};
   return unexpected(link.name +
                     " has no owner of DNS settings, while others do, and /etc/resolv.conf is that of the "
                     "whole host; let NetworkManager or systemd-networkd manage " +
                     link.name);
 }
 
+// In the order of docs/host.md.
+std::optional<OwnerDoubt> OwnerChoice::doubtAbout(const Link& link) {
+  if (isLoopback(link) || !owners_.whoIsLate().empty()) return std::nullopt;  // which choose() refuses
+  std::string chosen = owners_.factsOf(link).owner;
+  if (chosen.empty() && owners_.hostFacts() != nullptr) chosen = "systemd-resolved";
+  for (const char* owner : {"NetworkManager", "systemd-networkd", "systemd-resolved"}) {
+    if (chosen == owner) break;
+    if (auto doubt = doubts_.about(owner, link, owners_.runs(owner))) return doubt;
+  }
+  return std::nullopt;
+}
+
 // NetworkManager has every link as a device. One that it does not manage is left to whoever set it up.
 Expected<void, Refusal> OwnerChoice::refuseUnmanaged(const Link& link) {
-  std::string device;
-  const auto found = bus_.call(
-      {kNetworkManagerService, kNetworkManagerPath, kNetworkManagerService, "GetDeviceByIpIface"},
-      [&link](sd_bus_message* message) { return ::sd_bus_message_append(message, "s", link.name.c_str()); },
-      [&device](BusReader& reader) { device = reader.text(); });
-  if (!found) return {};
-  bool managed = false;
-  const auto asked = bus_.call(
-      {kNetworkManagerService, device, kBusProperties, "Get"},
-      [](sd_bus_message* message) { return ::sd_bus_message_append(message, "ss", kNetworkManagerDevice, "Managed"); },
-      [&managed](BusReader& reader) { reader.ifVariant("b", [&] { managed = reader.flag(); }); });
-  if (!asked) return unexpected("NetworkManager: " + asked.error());
-  if (managed) {
+  const auto device = readDevice(bus_, link.name);
+  if (!device) return {};
+  if (device->isManaged) {
     return unexpected(link.name +
                       " has no active profile of NetworkManager; 'nmcli connection add type ethernet ifname " +
                       link.name + "' makes one, and 'nmcli device connect " + link.name + "' uses it");

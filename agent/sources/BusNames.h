@@ -16,10 +16,17 @@ inline constexpr const char* kResolvedLink = "org.freedesktop.resolve1.Link";
 inline constexpr const char* kNetworkdService = "org.freedesktop.network1";
 inline constexpr const char* kNetworkdPath = "/org/freedesktop/network1";
 inline constexpr const char* kNetworkdManager = "org.freedesktop.network1.Manager";
+inline constexpr const char* kNetworkdLink = "org.freedesktop.network1.Link";
 
 // NetworkManager. Its service is also the interface of its manager.
 inline constexpr const char* kNetworkManagerService = "org.freedesktop.NetworkManager";
 inline constexpr const char* kNetworkManagerPath = "/org/freedesktop/NetworkManager";
 inline constexpr const char* kNetworkManagerDevice = "org.freedesktop.NetworkManager.Device";
+
+// The service manager
+inline constexpr const char* kSystemdService = "org.freedesktop.systemd1";
+inline constexpr const char* kSystemdPath = "/org/freedesktop/systemd1";
+inline constexpr const char* kSystemdManager = "org.freedesktop.systemd1.Manager";
+inline constexpr const char* kSystemdUnit = "org.freedesktop.systemd1.Unit";
 
 }  // namespace zorva::agent

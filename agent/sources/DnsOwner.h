@@ -59,6 +59,9 @@ class DnsOwner {
   /// Whether the bus has said whether the daemon runs.
   bool nameIsKnown() const { return nameIsKnown_; }
 
+  /// Whether it is on the bus, as far as is known.
+  bool runs() const { return !owner_.empty(); }
+
   /// What it says of a link, or null where it says nothing at all. Valid until the next look.
   virtual const DnsFacts* factsOf(const Link& link) const = 0;
 

@@ -125,6 +125,11 @@ void DnsOwners::look(const std::vector<Link>& links) {
   for (DnsOwner* owner : all_) owner->acceptChanges();
 }
 
+bool DnsOwners::runs(const std::string& owner) const {
+  return std::any_of(all_.begin(), all_.end(),
+                     [&](const DnsOwner* other) { return other->name() == owner && other->runs(); });
+}
+
 DnsFacts DnsOwners::factsOf(const Link& link) const {
   const DnsFacts* manager = networkManager_.factsOf(link);
   const DnsFacts* resolved = resolved_.factsOf(link);

@@ -41,6 +41,9 @@ class DnsOwners {
   /// Who has not answered yet, in words; empty where nobody is missing, or where there is no bus.
   std::string whoIsLate() const;
 
+  /// Whether the owner of that name is on the bus.
+  bool runs(const std::string& owner) const;
+
   /// What holds for a link, by the rules on the owner of an interface in docs/host.md; no lists where no owner has any.
   DnsFacts factsOf(const Link& link) const;
 

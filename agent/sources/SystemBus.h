@@ -66,6 +66,14 @@ class BusReader {
     forEachIn(SD_BUS_TYPE_DICT_ENTRY, '{' + contents + '}', contents, each);
   }
 
+  /// Reads a structure of these contents: calls read, which must read it whole.
+  template <typename Read>
+  void structure(const char* contents, Read read) {
+    enter(SD_BUS_TYPE_STRUCT, contents);
+    read();
+    leave();
+  }
+
   /// Reads a dictionary of properties: calls each with the name; each reads the value by ifVariant or leaves it alone.
   template <typename Each>
   void forEachProperty(Each each) {

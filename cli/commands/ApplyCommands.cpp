@@ -60,8 +60,8 @@ void writeTable(const Session& session, const std::vector<ApplyResult>& results,
   for (const ApplyResult& result : results) addResult(table, result, words);
   write(table.text(session.layout()));
   for (const ApplyResult& result : results) {
-    if (result.changes.empty() || !result.problem.empty()) continue;
-    if (!isDryRun)
+    if (!result.problem.empty()) continue;
+    if (!isDryRun && !result.changes.empty())
       write(printable(result.interface) + ": " + words.done + " by " + printable(frontend::ownerText(result)) + "\n");
     if (!result.note.empty()) tellNote(printable(result.interface + ": " + result.note));
   }

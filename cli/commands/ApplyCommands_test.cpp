@@ -4,6 +4,7 @@
 
 #include <filesystem>
 
+#include "agent/testing/DnsListeners.h"
 #include "agent/testing/NetworkNamespace.h"
 #include "agent/testing/PrivateHostTest.h"
 #include "agent/testing/TemporaryDirectory.h"
@@ -13,6 +14,7 @@ namespace {
 
 using namespace zorva::agent::testing;
 using ::testing::AllOf;
+using ::testing::ElementsAre;
 using ::testing::EndsWith;
 using ::testing::HasSubstr;
 using ::testing::Not;
@@ -190,6 +192,11 @@ class OwnedHost {
   static bool isWhole() { return hasOld() || hasNew(); }
   static bool appliesNow() { return run("apply eth0").ends_with("[0]\n") && hasNew(); }
 
+  void restartOwner() {
+    daemons_.stop(owner_.name);
+    daemons_.start(owner_.name);
+  }
+
  private:
   Owner owner_;
   Daemons daemons_;
@@ -227,6 +234,47 @@ bool survivesTheDeathOfTheProcess(const Owner& owner) {
     EXPECT_THAT(run("revert eth0"), EndsWith("[0]\n")) << delay;
     EXPECT_TRUE(host.hasOld()) << delay << ": " << host.shown();
   }
+  return true;
+}
+
+/// At several points of the work. It is waited for or is an error; nobody else gets the settings.
+bool survivesTheRestartOfItsOwner(const Owner& owner) {
+  OwnedHost host(owner, "overlay");
+  EXPECT_THAT(run("dns set eth0 192.0.2.53"), EndsWith("[0]\n"));
+  for (const int delay : {0, 10, 30, 60, 100, 200}) {
+    outputOf(std::string(kZorvactl) + "apply eth0 </dev/null >/run/log/apply 2>&1 &");
+    ::usleep(static_cast<useconds_t>(delay) * 1000);
+    host.restartOwner();
+    EXPECT_TRUE(becomesTrue(OwnedHost::appliesNow, 30)) << delay << ": " << host.shown();
+    const std::string state = contentsOf("/var/lib/zorvagent/applied/state.json");
+    EXPECT_THAT(state, HasSubstr(std::string("\"owner\": \"") + owner.name + '"')) << delay;
+    EXPECT_EQ(state.find("\"owner\": "), state.rfind("\"owner\": ")) << delay << state << contentsOf("/run/log/apply");
+    EXPECT_THAT(run("revert eth0"), EndsWith("[0]\n")) << delay;
+    EXPECT_TRUE(host.hasOld()) << delay << ": " << host.shown();
+    EXPECT_TRUE(isAsBefore()) << delay << ": " << resolvConf();
+    EXPECT_EQ(run("revert --all"), "zorvactl: note: nothing was ever applied\n[0]\n") << delay;
+  }
+  return true;
+}
+
+bool isUsedByTheCLibrary(const Owner& owner) {
+  const OwnedHost host(owner, "overlay");
+  Interfaces interfaces;
+  interfaces.addAddress("eth0", "192.0.2.11", 24);
+  for (const char* server : {"192.0.2.1", kNewServer}) interfaces.addAddress("lo", server, 32);
+  writeFile("/etc/nsswitch.conf", "hosts: dns\n");
+  writeFile("/etc/resolv.conf", "nameserver 127.0.0.53\n");
+  const auto askedFor = [](const std::string& name) {
+    DnsListeners listeners({"192.0.2.1", kNewServer}, DnsListeners::kNoSuchName);
+    listeners.lookUp(name);
+    return listeners.asked;
+  };
+  EXPECT_THAT(run(std::string("dns set eth0 ") + kNewServer), EndsWith("[0]\n"));
+  EXPECT_THAT(askedFor("before.lab.example."), ElementsAre("192.0.2.1"));
+  EXPECT_THAT(run("apply eth0"), EndsWith("[0]\n"));
+  EXPECT_THAT(askedFor("after.lab.example."), ElementsAre(kNewServer));
+  EXPECT_THAT(run("revert eth0"), EndsWith("[0]\n"));
+  EXPECT_THAT(askedFor("again.lab.example."), ElementsAre("192.0.2.1"));
   return true;
 }
 
@@ -297,9 +345,13 @@ TEST_F(ApplyToHost, BringsEachChangeToTheHostBeforeTheCommandEnds) {
 
 TEST_F(ApplyToHost, BringsAChangeToItsOwner) { expectOfEachOwner(reachesItsOwner); }
 
+TEST_F(ApplyToHost, IsUsedByTheCLibrary) { expectOfEachOwner(isUsedByTheCLibrary); }
+
 TEST_F(ApplyToHost, CanBeTriedAtEachOwner) { expectOfEachOwner(isTriedAtItsOwner); }
 
 TEST_F(ApplyToHost, LosesNothingWhenTheProcessDies) { expectOfEachOwner(survivesTheDeathOfTheProcess); }
+
+TEST_F(ApplyToHost, GoesToNobodyElseWhileItsOwnerRestarts) { expectOfEachOwner(survivesTheRestartOfItsOwner); }
 
 TEST_F(ApplyToHost, IsDoneByTheServerBeforeItAnswers) {
   EXPECT_TRUE(succeedsOnPrivateHost(theServerAppliesBeforeItAnswers));
