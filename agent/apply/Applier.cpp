@@ -69,6 +69,10 @@ std::string inOneLine(const std::string& text) {
   return line;
 }
 
+std::string noInterface(const std::string& name) {
+  return "there is no interface " + inOneLine(name) + "; 'zorvactl show --all' lists those that there are";
+}
+
 bool hasDnsSettings(const OverlayValues& overlay, const std::string& path) {
   const auto node = overlay.find(path);
   if (node == overlay.end()) return false;
@@ -139,7 +143,7 @@ Applier::Plan Applier::planFor(const HostInterface& interface, bool automatic) {
   plan.interface = interface;
   plan.result.interface = interface.name;
   if (!interface.exists()) {
-    plan.result.problem = "there is no interface " + inOneLine(interface.name);
+    plan.result.problem = noInterface(interface.name);
     return plan;
   }
   const auto read = readWanted(dataDir_, interface.name, overlay_, interface.path);
@@ -308,7 +312,7 @@ std::string Applier::notTaken(const Plan& plan) {
                (change.before.empty() ? "none" : joined(change.before)) + ", not " +
                (change.after.empty() ? "none" : joined(change.after)) + ")";
   }
-  return problem;
+  return problem + "; see what else sets it there, and apply again";
 }
 
 std::vector<ApplyResult> Applier::revert(const std::vector<std::string>& names, const ApplyOptions& options) {
@@ -347,7 +351,7 @@ ApplyResult Applier::revertOne(const HostInterface& interface, bool dryRun) {
   ApplyResult result;
   result.interface = interface.name;
   const std::vector<SavedDns> entries = entriesOf(interface.name);
-  if (entries.empty() && !interface.exists()) result.problem = "there is no interface " + inOneLine(interface.name);
+  if (entries.empty() && !interface.exists()) result.problem = noInterface(interface.name);
   for (const SavedDns& entry : entries) {
     const ApplyResult one = restore(entry, dryRun);
     result.owner = one.owner;

@@ -152,8 +152,9 @@ TEST(Trial, ThatCannotBeTakenBackIsTriedAgain) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
     host.apply({}, onTrial(seconds(60)));
     outputOf("mount --bind /etc /etc && mount -o remount,ro,bind /etc");
-    EXPECT_EQ(ApplyHost::linesOf(endTrial()),
-              "eth0: PROBLEM /etc/resolv.conf.new: cannot be opened: Read-only file system\n");
+    EXPECT_EQ(
+        ApplyHost::linesOf(endTrial()),
+        "eth0: PROBLEM /etc/resolv.conf.new: cannot be opened: Read-only file system; see to that, and apply again\n");
     EXPECT_TRUE(pendingTrial().has_value());
     outputOf("umount /etc");
     endTrial();
@@ -189,9 +190,10 @@ TEST(Refused, AreNamesWithoutAnInterfaceAndTheLoopbackInterface) {
     host.want("lo", "DNSSERVERS=192.0.2.1\n");
     host.want("gone0", "DNSSERVERS=192.0.2.1\n");
     EXPECT_EQ(host.apply({"eth0", "gone0", "lo", "a\nb", "gone0"}),
-              "gone0: PROBLEM there is no interface gone0\n"
-              "lo: PROBLEM lo is the loopback interface, which has no DNS settings of its own\n"
-              "a\nb: PROBLEM there is no interface a\\nb\n"
+              "gone0: PROBLEM there is no interface gone0; 'zorvactl show --all' lists those that there are\n"
+              "lo: PROBLEM lo is the loopback interface, which has no DNS settings of its own; name another one, "
+              "'zorvactl show --all' lists them\n"
+              "a\nb: PROBLEM there is no interface a\\nb; 'zorvactl show --all' lists those that there are\n"
               "eth0: dns_server_addresses 203.0.113.1 -> 192.0.2.1 \n");
     EXPECT_EQ(host.apply(), "eth0: nothing\n") << "files of interfaces that are gone are no reason to fail";
   }));

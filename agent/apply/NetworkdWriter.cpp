@@ -137,14 +137,18 @@ class NetworkdWriter : public DnsWriter {
     if (!directory) return unexpected(directory.error());
     std::error_code error;
     std::filesystem::create_directories(*directory, error);
-    if (error) return unexpected(*directory + ": cannot be made: " + error.message());
+    if (error) return unexpected(notWritten(*directory + ": cannot be made: " + error.message()));
     try {
       const std::string unsynced = util::replaceFile(*directory, kFileName, text);
       if (!unsynced.empty()) ZORVAGENT_LOG_ERROR(unsynced);
       return {};
     } catch (const std::exception& problem) {
-      return unexpected(std::string(problem.what()));
+      return unexpected(notWritten(problem.what()));
     }
+  }
+
+  static std::string notWritten(const std::string& problem) {
+    return std::string(kOwner) + " needs a drop-in: " + problem + "; see to that, and apply again";
   }
 
   Expected<void, Refusal> remove(const DnsTarget& target) const {
@@ -152,7 +156,7 @@ class NetworkdWriter : public DnsWriter {
     if (!directory) return unexpected(directory.error());
     const std::string path = *directory + kFileName;
     if (::unlink(path.c_str()) != 0 && errno != ENOENT) {
-      return unexpected(path + ": cannot be removed: " + std::generic_category().message(errno));
+      return unexpected(notWritten(path + ": cannot be removed: " + std::generic_category().message(errno)));
     }
     ::rmdir(directory->c_str());  // stays where it has other files
     return {};
@@ -162,7 +166,8 @@ class NetworkdWriter : public DnsWriter {
 
   static Expected<void, Refusal> told(const Expected<void, std::string>& answer) {
     if (answer) return {};
-    return unexpected(std::string(kOwner) + ": " + answer.error());
+    return unexpected(std::string(kOwner) + ": " + answer.error() +
+                      "; 'journalctl --unit systemd-networkd' may say more; see to that, and apply again");
   }
 
   static constexpr std::string_view kSuffix = ".network";

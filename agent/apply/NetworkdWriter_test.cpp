@@ -103,7 +103,9 @@ TEST_P(NetworkdChange, IsShownLastsAndIsTakenBack) {
     EXPECT_EQ(host.revert(), "tun1: dns_server_addresses 198.51.100.99 -> 198.51.100.53 \n");
     EXPECT_EQ(filesOfNetworkd(), before);
     EXPECT_FALSE(std::filesystem::exists("/etc/systemd/network/10-lan.network.d"));
-    EXPECT_EQ(host.revert({"eth0", "eth9"}), "eth9: PROBLEM there is no interface eth9\neth0: nothing\n");
+    EXPECT_EQ(
+        host.revert({"eth0", "eth9"}),
+        "eth9: PROBLEM there is no interface eth9; 'zorvactl show --all' lists those that there are\neth0: nothing\n");
   }));
 }
 
@@ -187,6 +189,8 @@ TEST(NetworkdWriter, WhatIsNotTakenIsNamedAndPutBack) {
     host.want("eth0", "DNSSERVERS=192.0.2.99\nDNSSUFFIXES=new.example\n");
     EXPECT_EQ(host.apply(),
               "eth0: PROBLEM systemd-networkd did not take dns_server_addresses (it has 192.0.2.66, not 192.0.2.99); "
+              "see what else sets it there, "
+              "and apply again; "
               "eth0 is as it was before\n");
     EXPECT_EQ(filesOfNetworkd(), before);
     host.expectShown("eth0", "192.0.2.66 /lan.example ");
@@ -205,7 +209,9 @@ TEST(NetworkdWriter, AReloadThatIsRefusedLeavesTheFilesAsTheyWere) {
     });
     const std::string before = filesOfNetworkd();
     host.want("eth0", "DNSSERVERS=192.0.2.99\n");
-    EXPECT_EQ(host.apply(), "eth0: PROBLEM systemd-networkd: Reload is refused: it does not want to\n");
+    EXPECT_EQ(host.apply(),
+              "eth0: PROBLEM systemd-networkd: Reload is refused: it does not want to; 'journalctl --unit "
+              "systemd-networkd' may say more; see to that, and apply again\n");
     EXPECT_EQ(filesOfNetworkd(), before);
     EXPECT_EQ(host.revert(), "");
   }));
@@ -236,7 +242,8 @@ TEST(NetworkdWriter, AReadOnlyFileSystemIsReported) {
     outputOf("mount --bind /etc /etc && mount -o remount,ro,bind /etc");
     host.want("eth0", "DNSSERVERS=192.0.2.99\n");
     EXPECT_EQ(host.apply(),
-              "eth0: PROBLEM /etc/systemd/network/10-lan.network.d/: cannot be made: Read-only file system\n");
+              "eth0: PROBLEM systemd-networkd needs a drop-in: /etc/systemd/network/10-lan.network.d/: cannot be made: "
+              "Read-only file system; see to that, and apply again\n");
     host.expectShown("eth0", kLanBefore);
   }));
 }

@@ -31,7 +31,9 @@ void OwnerChoice::look(const std::vector<Link>& links) {
 
 Expected<ChosenOwner, Refusal> OwnerChoice::choose(const Link& link) {
   if (isLoopback(link)) {
-    return unexpected(link.name + " is the loopback interface, which has no DNS settings of its own");
+    return unexpected(link.name +
+                      " is the loopback interface, which has no DNS settings of its own; name another one, 'zorvactl "
+                      "show --all' lists them");
   }
   if (const std::string late = owners_.whoIsLate(); !late.empty()) {
     return unexpected(late + " does not answer, so who owns the DNS settings of " + link.name +

@@ -260,10 +260,10 @@ TEST_F(ChoiceOfOwner, IsRememberedWhereItMayHaveTakenWhatFailed) {
                                 "]}]}]}";
       return method == "Describe" ? ::sd_bus_message_append(answer, "s", links.c_str()) : -1;
     });
-    EXPECT_EQ(
-        host.apply(),
-        "eth0: PROBLEM systemd-networkd: Reload is refused: it does not want to; 'zorvactl revert eth0' takes back "
-        "what may have been changed\n");
+    EXPECT_EQ(host.apply(),
+              "eth0: PROBLEM systemd-networkd: Reload is refused: it does not want to; 'journalctl --unit "
+              "systemd-networkd' may say more; see to that, and apply again; 'zorvactl revert eth0' takes back "
+              "what may have been changed\n");
     EXPECT_FALSE(std::filesystem::exists(kLan + std::string(".d/50-zorva.conf")));
     EXPECT_THAT(host.revert(), HasSubstr("PROBLEM")) << "it is not forgotten";
   }));

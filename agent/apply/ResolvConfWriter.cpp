@@ -152,7 +152,7 @@ class ResolvConfWriter : public DnsWriter {
       return unexpected(std::string(error.what()));
     }
     if (!file->isThere || ::unlink((root_ + file->path).c_str()) == 0) return {};
-    return unexpected(file->path + ": cannot be removed: " + std::generic_category().message(errno));
+    return unexpected(file->path + ": cannot be removed: " + std::generic_category().message(errno) + kThenAgain);
   }
 
   std::string note() const override {
@@ -182,9 +182,10 @@ class ResolvConfWriter : public DnsWriter {
     }
     const util::FileText content = util::readFile(root_ + file.path, kLargestFile);
     if (content.error != 0 && content.error != ENOENT) {
-      return unexpected(file.path + ": cannot be read: " + util::fileErrorText(content.error));
+      return unexpected(file.path + ": cannot be read: " + util::fileErrorText(content.error) + kThenAgain);
     }
-    if (content.truncated) return unexpected(file.path + ": is larger than 64 KiB, and is left as it is");
+    if (content.truncated)
+      return unexpected(file.path + ": is larger than 64 KiB, and is left as it is; make it smaller, then apply again");
     if (isMountPoint(root_ + file.path)) {
       return unexpected(refusalOf(kContainer, "it is a mount of its own, which cannot be replaced"));
     }
@@ -223,11 +224,12 @@ class ResolvConfWriter : public DnsWriter {
       if (!unsynced.empty()) ZORVAGENT_LOG_ERROR(unsynced);
       return {};
     } catch (const std::exception& error) {
-      return unexpected(std::string(error.what()));
+      return unexpected(error.what() + std::string(kThenAgain));
     }
   }
 
   static constexpr std::size_t kLongestLine = 80;
+  static constexpr const char* kThenAgain = "; see to that, and apply again";
 
   std::string root_;
   bool tooMany_ = false;

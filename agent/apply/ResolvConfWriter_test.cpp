@@ -201,7 +201,9 @@ TEST(ResolvConfChange, AReadOnlyFileSystemIsReportedAndNothingIsRemembered) {
   EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
     outputOf("mount --bind /etc /etc && mount -o remount,ro,bind /etc");
-    EXPECT_EQ(host.apply(), "eth0: PROBLEM /etc/resolv.conf.new: cannot be opened: Read-only file system\n");
+    EXPECT_EQ(
+        host.apply(),
+        "eth0: PROBLEM /etc/resolv.conf.new: cannot be opened: Read-only file system; see to that, and apply again\n");
     EXPECT_EQ(contentsOf(kFile), kBefore);
     EXPECT_EQ(host.revert(), "");
     outputOf(
