@@ -189,9 +189,7 @@ TEST(NetworkdWriter, WhatIsNotTakenIsNamedAndPutBack) {
     host.want("eth0", "DNSSERVERS=192.0.2.99\nDNSSUFFIXES=new.example\n");
     EXPECT_EQ(host.apply(),
               "eth0: PROBLEM systemd-networkd did not take dns_server_addresses (it has 192.0.2.66, not 192.0.2.99); "
-              "see what else sets it there, "
-              "and apply again; "
-              "eth0 is as it was before\n");
+              "see what else sets it there, and apply again; eth0 is as it was before\n");
     EXPECT_EQ(filesOfNetworkd(), before);
     host.expectShown("eth0", "192.0.2.66 /lan.example ");
     EXPECT_EQ(host.revert(), "") << "nothing was changed, and nothing is remembered";
