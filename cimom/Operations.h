@@ -13,9 +13,9 @@
 #include "access/Role.h"
 #include "broker/Broker.h"
 #include "cimom/Pull.h"
-#include "cimom/ServiceHost.h"
 #include "cimxml/RequestReader.h"
 #include "cimxml/ResponseWriter.h"
+#include "util/ServiceHost.h"
 
 namespace zorva::cimom {
 
@@ -23,7 +23,7 @@ namespace zorva::cimom {
 struct Operation {
   broker::Broker& broker;
   PullTable& pulls;
-  const ServiceHost& host;
+  const util::ServiceHost& host;
   const broker::Caller& caller;
   const cimxml::Call& call;
   cimxml::ResponseWriter& writer;

@@ -11,10 +11,10 @@
 #include "cimom/Operations.h"
 #include "cimom/Pull.h"
 #include "cimom/ServiceHeaders.h"
-#include "cimom/ServiceHost.h"
 #include "cimxml/RequestReader.h"
 #include "cimxml/ResponseWriter.h"
 #include "util/NotCopied.h"
+#include "util/ServiceHost.h"
 
 namespace zorva::cimom {
 
@@ -269,7 +269,7 @@ class ServiceCore {
 
   broker::Broker& broker_;
   const ServiceOptions options_;
-  const ServiceHost host_;
+  const util::ServiceHost host_;
   PullTable pulls_;
   std::binary_semaphore largeReads_{1};
 };

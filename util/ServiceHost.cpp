@@ -1,4 +1,4 @@
-#include "cimom/ServiceHost.h"
+#include "util/ServiceHost.h"
 
 #include <arpa/inet.h>
 #include <ifaddrs.h>
@@ -12,12 +12,12 @@
 #include "util/HostName.h"
 #include "util/Names.h"
 
-namespace zorva::cimom {
+namespace zorva::util {
 
 namespace {
 
 std::string kernelName() {
-  const std::string name = util::kernelHostName();
+  const std::string name = kernelHostName();
   return name.empty() ? "localhost" : name;
 }
 
@@ -69,10 +69,10 @@ std::string_view firstLabel(std::string_view name) noexcept { return name.substr
 
 /// True if the names are equal, or one is the other with a domain.
 bool sameHost(std::string_view a, std::string_view b) noexcept {
-  if (util::sameName(a, b)) return true;
+  if (sameName(a, b)) return true;
   const bool aIsShort = a.find('.') == std::string_view::npos;
   const bool bIsShort = b.find('.') == std::string_view::npos;
-  return aIsShort != bIsShort && util::sameName(firstLabel(a), firstLabel(b));
+  return aIsShort != bIsShort && sameName(firstLabel(a), firstLabel(b));
 }
 
 }  // namespace
@@ -84,8 +84,8 @@ bool ServiceHost::isThis(std::string_view text, std::string_view hostHeader) con
   if (host.ends_with('.')) host.remove_suffix(1);
   if (host.empty()) return false;
   if (const std::string address = addressOf(host); !address.empty()) return isOwnAddress(address);
-  return util::sameName(host, "localhost") || util::sameName(firstLabel(host), "localhost") ||
-         util::sameName(host, withoutPort(hostHeader)) || sameHost(host, name_) || sameHost(host, kernelName());
+  return sameName(host, "localhost") || sameName(firstLabel(host), "localhost") ||
+         sameName(host, withoutPort(hostHeader)) || sameHost(host, name_) || sameHost(host, kernelName());
 }
 
-}  // namespace zorva::cimom
+}  // namespace zorva::util

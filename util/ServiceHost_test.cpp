@@ -1,9 +1,9 @@
-#include "cimom/ServiceHost.h"
+#include "util/ServiceHost.h"
 
 #include <gtest/gtest.h>
 #include <unistd.h>
 
-namespace zorva::cimom {
+namespace zorva::util {
 namespace {
 
 TEST(ServiceHost, KnowsItsNamesAndAddresses) {
@@ -31,4 +31,4 @@ TEST(ServiceHost, HasTheNameThatTheKernelKnows) {
 }
 
 }  // namespace
-}  // namespace zorva::cimom
+}  // namespace zorva::util

@@ -5,7 +5,7 @@
 #include <string>
 #include <string_view>
 
-namespace zorva::cimom {
+namespace zorva::util {
 
 class ServiceHost {
  public:
@@ -23,4 +23,4 @@ class ServiceHost {
   std::string name_;
 };
 
-}  // namespace zorva::cimom
+}  // namespace zorva::util
