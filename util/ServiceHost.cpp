@@ -4,6 +4,7 @@
 #include <ifaddrs.h>
 #include <netinet/in.h>
 
+#include <algorithm>
 #include <cstring>
 #include <memory>
 #include <optional>
@@ -11,6 +12,7 @@
 
 #include "util/HostName.h"
 #include "util/Names.h"
+#include "util/ReadFile.h"
 
 namespace zorva::util {
 
@@ -19,17 +21,6 @@ namespace {
 std::string kernelName() {
   const std::string name = kernelHostName();
   return name.empty() ? "localhost" : name;
-}
-
-/// "h" of "h", "h:5988", "[::1]:5988" and "::1".
-std::string_view withoutPort(std::string_view text) noexcept {
-  if (text.starts_with('[')) {
-    const std::size_t end = text.find(']');
-    return end == std::string_view::npos ? text : text.substr(1, end - 1);
-  }
-  const std::size_t colon = text.find(':');
-  const bool isAddress = colon != std::string_view::npos && text.find(':', colon + 1) != std::string_view::npos;
-  return isAddress ? text : text.substr(0, colon);
 }
 
 /// The bytes of an address; empty if the text is not an address.
@@ -54,15 +45,53 @@ std::string addressOf(const sockaddr* address) {
   return {};
 }
 
-bool isOwnAddress(const std::string& address) {
-  if (address.size() == sizeof(in_addr) && address[0] == 127) return true;
+/// The bytes of the addresses of all interfaces.
+std::vector<std::string> interfaceAddresses() {
+  std::vector<std::string> addresses;
   ifaddrs* list = nullptr;
-  if (getifaddrs(&list) != 0) return false;
+  if (getifaddrs(&list) != 0) return addresses;
   const std::unique_ptr<ifaddrs, decltype(&freeifaddrs)> owner(list, freeifaddrs);
   for (const ifaddrs* one = list; one != nullptr; one = one->ifa_next) {
-    if (addressOf(one->ifa_addr) == address) return true;
+    std::string address = addressOf(one->ifa_addr);
+    if (!address.empty()) addresses.push_back(std::move(address));
   }
-  return false;
+  return addresses;
+}
+
+bool isOwn(const std::string& address) {
+  if (address.size() == sizeof(in_addr) && address[0] == 127) return true;
+  const std::vector<std::string> all = interfaceAddresses();
+  return std::find(all.begin(), all.end(), address) != all.end();
+}
+
+bool isOfLink(const std::string& address) {
+  return address.size() == sizeof(in6_addr) && address[0] == '\xFE' && (address[1] & '\xC0') == '\x80';
+}
+
+std::string textOf(const std::string& address) {
+  char text[INET6_ADDRSTRLEN] = "";
+  const int family = address.size() == sizeof(in_addr) ? AF_INET : AF_INET6;
+  inet_ntop(family, address.data(), text, sizeof text);
+  return text;
+}
+
+/// The words of a line of the hosts file; the first is the address.
+std::vector<std::string_view> wordsOf(std::string_view line) {
+  constexpr std::string_view kBlanks = " \t\r";
+  line = line.substr(0, line.find('#'));
+  std::vector<std::string_view> words;
+  for (;;) {
+    const std::size_t begin = std::min(line.find_first_not_of(kBlanks), line.size());
+    const std::size_t end = std::min(line.find_first_of(kBlanks, begin), line.size());
+    if (begin == end) return words;
+    words.push_back(line.substr(begin, end - begin));
+    line.remove_prefix(end);
+  }
+}
+
+void addOnce(std::vector<std::string>& names, std::string_view name) {
+  const bool isThere = std::any_of(names.begin(), names.end(), [&](const auto& each) { return sameName(each, name); });
+  if (!isThere && !name.empty()) names.emplace_back(name);
 }
 
 std::string_view firstLabel(std::string_view name) noexcept { return name.substr(0, name.find('.')); }
@@ -77,13 +106,56 @@ bool sameHost(std::string_view a, std::string_view b) noexcept {
 
 }  // namespace
 
+std::string_view withoutPort(std::string_view text) noexcept {
+  if (text.starts_with('[')) {
+    const std::size_t end = text.find(']');
+    return end == std::string_view::npos ? text : text.substr(1, end - 1);
+  }
+  const std::size_t colon = text.find(':');
+  const bool isAddress = colon != std::string_view::npos && text.find(':', colon + 1) != std::string_view::npos;
+  if (!isAddress) text = text.substr(0, colon);
+  if (text.ends_with('.')) text.remove_suffix(1);
+  return text;
+}
+
+bool isOwnAddress(std::string_view text) {
+  const std::string address = addressOf(text);
+  return !address.empty() && isOwn(address);
+}
+
+std::vector<std::string> ownAddresses() {
+  std::vector<std::string> addresses;
+  for (const std::string& each : interfaceAddresses()) {
+    if (!isOfLink(each)) addOnce(addresses, textOf(each));
+  }
+  return addresses;
+}
+
+std::vector<std::string> ownNames(const std::string& hostsFile) {
+  constexpr std::size_t kLargestFile = std::size_t{1} << 20;
+  const std::string own = kernelName();
+  std::vector<std::string> names;
+  addOnce(names, own);
+  addOnce(names, firstLabel(own));
+  addOnce(names, "localhost");
+  const std::string text = readFile(hostsFile, kLargestFile).text;
+  for (std::size_t begin = 0; begin < text.size();) {
+    const std::size_t end = std::min(text.find('\n', begin), text.size());
+    const auto words = wordsOf(std::string_view(text).substr(begin, end - begin));
+    begin = end + 1;
+    const bool isNamed = std::any_of(words.begin(), words.end(), [&](auto word) { return sameName(word, own); });
+    if (!isNamed || !isOwnAddress(words.front())) continue;
+    for (std::size_t i = 1; i < words.size(); ++i) addOnce(names, words[i]);
+  }
+  return names;
+}
+
 ServiceHost::ServiceHost(std::string name) : name_(name.empty() ? kernelName() : std::move(name)) {}
 
 bool ServiceHost::isThis(std::string_view text, std::string_view hostHeader) const {
-  std::string_view host = withoutPort(text);
-  if (host.ends_with('.')) host.remove_suffix(1);
+  const std::string_view host = withoutPort(text);
   if (host.empty()) return false;
-  if (const std::string address = addressOf(host); !address.empty()) return isOwnAddress(address);
+  if (const std::string address = addressOf(host); !address.empty()) return isOwn(address);
   return sameName(host, "localhost") || sameName(firstLabel(host), "localhost") ||
          sameName(host, withoutPort(hostHeader)) || sameHost(host, name_) || sameHost(host, kernelName());
 }

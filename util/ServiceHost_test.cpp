@@ -1,10 +1,17 @@
 #include "util/ServiceHost.h"
 
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <unistd.h>
 
+#include "agent/testing/TemporaryDirectory.h"
+
 namespace zorva::util {
 namespace {
+
+using ::testing::Contains;
+using ::testing::IsSupersetOf;
+using ::testing::Not;
 
 TEST(ServiceHost, KnowsItsNamesAndAddresses) {
   const ServiceHost host("web.example.org");
@@ -28,6 +35,29 @@ TEST(ServiceHost, HasTheNameThatTheKernelKnows) {
   ASSERT_EQ(gethostname(name, sizeof name - 1), 0);
   EXPECT_EQ(ServiceHost("").name(), name);
   EXPECT_TRUE(ServiceHost("given").isThis(name, ""));
+}
+
+TEST(OwnNames, AreThoseOfTheHostsFileForAnOwnAddress) {
+  char kernel[256] = {};
+  ASSERT_EQ(gethostname(kernel, sizeof kernel - 1), 0);
+  const std::string name = kernel;
+  const agent::testing::TemporaryDirectory directory;
+  const std::string hosts = directory.write("hosts", "127.0.1.1\t" + name + ".example.org " + name +
+                                                         " www # alias\n"
+                                                         "192.0.2.9 " +
+                                                         name + " elsewhere.example.org\n127.0.0.1 other\n\n#");
+  const std::vector<std::string> names = ownNames(hosts);
+  EXPECT_THAT(names, IsSupersetOf({name, std::string("localhost"), name + ".example.org", std::string("www")}));
+  EXPECT_THAT(names, Not(Contains("elsewhere.example.org")));
+  EXPECT_THAT(names, Not(Contains("other")));
+}
+
+TEST(OwnNames, OfAnUnreadableHostsFileAreTheKernels) { EXPECT_THAT(ownNames("/no/such/file"), Contains("localhost")); }
+
+TEST(OwnAddresses, AreAddressesOfThisHost) {
+  EXPECT_THAT(ownAddresses(), Contains("127.0.0.1"));
+  for (const std::string& each : ownAddresses()) EXPECT_TRUE(isOwnAddress(each)) << each;
+  for (const char* other : {"192.0.2.99", "localhost", "", "2001:db8::99"}) EXPECT_FALSE(isOwnAddress(other)) << other;
 }
 
 }  // namespace

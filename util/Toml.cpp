@@ -57,6 +57,10 @@ void TomlTable::take(const char* key, std::string& value) {
   if (const Node found = find(key); found.node != nullptr) value = textOf(found, key);
 }
 
+void TomlTable::take(const char* key, std::optional<std::string>& value) {
+  if (const Node found = find(key); found.node != nullptr) value = textOf(found, key);
+}
+
 void TomlTable::take(const char* key, bool& value) {
   const toml::node* node = find(key).node;
   if (node == nullptr) return;

@@ -53,6 +53,7 @@ class TomlTable : util::NotCopied {
   ~TomlTable();
 
   void take(const char* key, std::string& value);
+  void take(const char* key, std::optional<std::string>& value);
   void take(const char* key, bool& value);
   void take(const char* key, int& value);
   void take(const char* key, int& value, int least, int most);
