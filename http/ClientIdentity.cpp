@@ -1,6 +1,5 @@
 #include "http/ClientIdentity.h"
 
-#include <arpa/inet.h>
 #include <linux/inet_diag.h>
 #include <linux/netlink.h>
 #include <linux/sock_diag.h>
@@ -9,6 +8,7 @@
 #include <cstring>
 #include <optional>
 
+#include "http/AddressText.h"
 #include "util/FileDescriptor.h"
 
 namespace zorva::http {
@@ -37,11 +37,6 @@ End endOf(const sockaddr_storage& address) {
     end.address[0] = v4.sin_addr.s_addr;
   }
   return end;
-}
-
-bool isLoopback(const End& end) {
-  if (end.family == AF_INET) return ntohl(end.address[0]) >> 24 == 127;
-  return end.family == AF_INET6 && std::memcmp(end.address, &in6addr_loopback, sizeof in6addr_loopback) == 0;
 }
 
 /// The owner of the socket of this host that is bound to `own` and connected to `other`.
@@ -76,20 +71,47 @@ std::optional<std::uint32_t> ownerOf(const End& own, const End& other) {
   return message.idiag_uid;
 }
 
+/// The process at the other end of a Unix socket, as it was when it connected.
+std::optional<ucred> processAt(int socket) {
+  ucred process{};
+  socklen_t size = sizeof process;
+  if (::getsockopt(socket, SOL_SOCKET, SO_PEERCRED, &process, &size) != 0) return std::nullopt;
+  return process;
+}
+
 }  // namespace
 
 std::string clientOf(int socket, const sockaddr_storage& peer) {
-  const End other = endOf(peer);
-  if (!isLoopback(other)) {
-    char text[INET6_ADDRSTRLEN] = "";
-    ::inet_ntop(other.family, other.address, text, sizeof text);
-    return text;
+  if (peer.ss_family == AF_UNIX) {
+    const auto process = processAt(socket);
+    return process ? "user " + std::to_string(process->uid) : "this host";
   }
+  if (!isLoopback(peer)) return hostText(peer);
   sockaddr_storage local{};
   socklen_t size = sizeof local;
   if (::getsockname(socket, reinterpret_cast<sockaddr*>(&local), &size) != 0) return "this host";
-  const auto owner = ownerOf(other, endOf(local));
+  const auto owner = ownerOf(endOf(peer), endOf(unmapped(local)));
   return owner ? "user " + std::to_string(*owner) : "this host";
+}
+
+access::Origin originOf(int socket, const sockaddr_storage& peer, bool isEncrypted) {
+  access::Origin origin;
+  origin.isEncrypted = isEncrypted;
+  origin.address = hostText(peer);
+  if (peer.ss_family == AF_UNIX) {
+    origin.way = access::Origin::Way::UnixSocket;
+    if (const auto process = processAt(socket)) origin.localUser = process->uid;
+  } else {
+    origin.way = isLoopback(peer) ? access::Origin::Way::Loopback : access::Origin::Way::Network;
+  }
+  return origin;
+}
+
+std::string peerText(int socket, const sockaddr_storage& peer) {
+  if (peer.ss_family != AF_UNIX) return addressText(peer);
+  const auto process = processAt(socket);
+  // A process of another process namespace has the number 0.
+  return process && process->pid > 0 ? "process " + std::to_string(process->pid) : addressText(peer);
 }
 
 }  // namespace zorva::http

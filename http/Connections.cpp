@@ -64,11 +64,12 @@ milliseconds Connection::inPhase() const noexcept {
   return milliseconds(now > since ? now - since : 0);
 }
 
-void Connections::add(int socket, std::string peer, std::string client) {
-  auto connection = std::make_shared<Connection>(socket, std::move(peer), std::move(client));
+std::shared_ptr<Connection> Connections::add(int socket, std::string peer, std::string client, access::Origin origin) {
+  auto connection = std::make_shared<Connection>(socket, std::move(peer), std::move(client), std::move(origin));
   const std::lock_guard lock(mutex_);
   connection->place_ = connections_.size();
-  connections_.push_back(std::move(connection));
+  connections_.push_back(connection);
+  return connection;
 }
 
 std::shared_ptr<Connection> Connections::find(int socket) const {

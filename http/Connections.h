@@ -10,6 +10,7 @@
 #include <memory>
 #include <mutex>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "access/Origin.h"
@@ -36,6 +37,13 @@ class Connection {
 
   const access::Origin& origin() const noexcept { return origin_; }
 
+  /// What the first request finds out of the client's certificate. Used by the connection's event thread before any
+  /// other thread sees the origin.
+  void setCertificate(access::Certificate certificate) { origin_.certificate = std::move(certificate); }
+
+  /// The value of the header Host that was found to name this host. Used by the connection's event thread.
+  std::string knownHost;
+
   /// Enters a phase, or notes that something happened in it. A phase and its time are always read together.
   void enter(Phase phase) noexcept;
 
@@ -54,7 +62,7 @@ class Connection {
   friend class Connections;
   const std::string peer_;
   const std::string client_;
-  const access::Origin origin_;
+  access::Origin origin_;
   std::atomic<std::uint64_t> state_;  ///< milliseconds of the steady clock, times four, and the phase
   std::atomic<bool> proven_ = false;
   std::atomic<std::size_t> held_ = 0;
@@ -67,7 +75,7 @@ class Connection {
 class Connections {
  public:
   /// Call it before the socket is passed to the HTTP library.
-  void add(int socket, std::string peer, std::string client);
+  std::shared_ptr<Connection> add(int socket, std::string peer, std::string client, access::Origin origin = {});
 
   /// The connection with that open socket.
   std::shared_ptr<Connection> find(int socket) const;

@@ -1,6 +1,7 @@
 #include "http/HttpServer.h"
 
 #include <arpa/inet.h>
+#include <gnutls/abstract.h>
 #include <microhttpd.h>
 #include <netinet/in.h>
 #include <unistd.h>
@@ -10,6 +11,7 @@
 #include <cstdarg>
 #include <cstdio>
 #include <cstring>
+#include <iterator>
 #include <mutex>
 #include <optional>
 #include <stdexcept>
@@ -19,12 +21,17 @@
 #include "http/AddressText.h"
 #include "http/ClientIdentity.h"
 #include "http/Connections.h"
+#include "http/HostNames.h"
 #include "http/HttpExchange.h"
 #include "http/Log.h"
 #include "http/LoginQueue.h"
+#include "http/Reception.h"
 #include "http/RequestHead.h"
+#include "http/TlsIdentity.h"
 #include "http/Workers.h"
+#include "util/FileDescriptor.h"
 #include "util/Names.h"
+#include "util/ServiceHost.h"
 
 namespace zorva::http {
 
@@ -54,9 +61,44 @@ std::optional<Refusal> refusalOf(access::Decision& decision) {
 /// What the HTTP library stores for a request.
 using Holder = std::shared_ptr<HttpExchange>;
 
-std::shared_ptr<Connection> connectionOf(MHD_Connection* connection) {
+/// What the HTTP library stores for a connection.
+struct OpenConnection {
+  std::shared_ptr<Connection> client;
+  std::shared_ptr<const TlsIdentity> tls;  ///< null: no TLS
+  bool isSecured = false;                  ///< the handshake of TLS is complete
+  bool isIdentified = false;               ///< its certificate was looked at
+  std::string refusal;                     ///< what is wrong with the client's certificate
+};
+
+OpenConnection& openConnectionOf(MHD_Connection* connection) {
   const MHD_ConnectionInfo* info = MHD_get_connection_info(connection, MHD_CONNECTION_INFO_SOCKET_CONTEXT);
-  return *static_cast<std::shared_ptr<Connection>*>(info->socket_context);
+  return *static_cast<OpenConnection*>(info->socket_context);
+}
+
+/// Null for a connection without TLS.
+gnutls_session_t sessionOf(MHD_Connection* connection) {
+  const MHD_ConnectionInfo* info = MHD_get_connection_info(connection, MHD_CONNECTION_INFO_GNUTLS_SESSION);
+  return info == nullptr ? nullptr : static_cast<gnutls_session_t>(info->tls_session);
+}
+
+/// Called when the last message of a handshake was sent or received.
+int onHandshakeFinished(gnutls_session_t session, unsigned int, unsigned int, unsigned int, const gnutls_datum_t*) {
+  static_cast<OpenConnection*>(gnutls_session_get_ptr(session))->isSecured = true;
+  return 0;
+}
+
+/// Lines of the library that say nothing useful: a Unix socket has no options of TCP, and onConnection() reports failed
+/// handshakes with the address.
+bool isNoise(std::string_view line) {
+  constexpr std::string_view kNoise[] = {"Setting TCP_", "Failed to push the data from buffers",
+                                         "Error: received handshake message out of context"};
+  return std::any_of(std::begin(kNoise), std::end(kNoise), [&](auto each) { return line.starts_with(each); });
+}
+
+/// The library asks for a certificate if a session has none of its own: then it fails.
+int noCertificate(gnutls_session_t, const gnutls_cert_retr_st*, gnutls_pcert_st**, unsigned int*, gnutls_ocsp_data_st**,
+                  unsigned int*, gnutls_privkey_t*, unsigned int*) {
+  return -1;
 }
 
 std::string withoutLineEnd(std::string text) {
@@ -71,7 +113,11 @@ class HttpServer::Core {
   Core(const HttpLimits& limits, int threads, Handler handler, std::string page, std::shared_ptr<access::Gate> gate);
   ~Core();
 
-  void take(int socket, const sockaddr_storage& peer, socklen_t peerSize);
+  void take(int socket, const sockaddr_storage& peer, socklen_t peerSize, Door door);
+  int newcomers() const { return reception_.descriptor(); }
+  void look() { reception_.look(); }
+  void setTls(std::shared_ptr<const TlsIdentity> identity);
+  void setHostNames(const std::vector<std::string>& names);
   void setLimits(const HttpLimits& limits);
   void sweep();
   bool hasWork() const;
@@ -91,6 +137,10 @@ class HttpServer::Core {
   static void onLog(void* core, const char* format, va_list arguments);
 
   MHD_Result readHead(Holder& exchange, MHD_Connection* connection, const char* method, const char* version);
+  void admitNewcomer(Newcomer&& newcomer);
+  std::optional<Refusal> identify(OpenConnection& connection, gnutls_session_t session);
+  std::optional<Refusal> checkWebPage(OpenConnection& connection, const HeaderList& headers);
+  std::optional<Refusal> checkRequest(MHD_Connection* connection, HttpExchange& exchange, const char* version);
   std::optional<Refusal> admit(HttpExchange& exchange);
   void awaitLogin(HttpExchange& exchange, const std::string* authorization);
   MHD_Result loginIsDecided(HttpExchange& exchange, MHD_Connection* connection);
@@ -101,11 +151,17 @@ class HttpServer::Core {
   MHD_Result requestIsWhole(const Holder& exchange);
   void logRefusal(const HttpExchange& exchange, const Refusal& refusal) const;
   void logAnswer(const HttpExchange& exchange) const;
-  void startDaemon(int threads);
+  MHD_Daemon* startDaemon(Door door) const;
+  void stopDaemons();
   HttpLimits limits() const;
+  template <typename Value>
+  std::shared_ptr<const Value> shared(const std::shared_ptr<const Value>& value) const;
 
   mutable std::mutex limitsMutex_;
   HttpLimits limits_;
+  std::shared_ptr<const TlsIdentity> tls_;  ///< of new connections
+  std::shared_ptr<const HostNames> names_ = std::make_shared<const HostNames>();
+  const int threads_;
   const std::string page_;
   const std::shared_ptr<access::Gate> gate_;
   Connections connections_;
@@ -114,43 +170,64 @@ class HttpServer::Core {
   std::atomic<std::size_t> bodies_ = 0;  ///< bytes of unfinished requests
   std::atomic<std::size_t> requests_ = 0;
   MHD_Daemon* daemon_ = nullptr;
+  MHD_Daemon* tlsDaemon_ = nullptr;
+  Reception reception_;
 };
 
 HttpServer::Core::Core(const HttpLimits& limits, int threads, Handler handler, std::string page,
                        std::shared_ptr<access::Gate> gate)
     : limits_(limits),
+      threads_(threads),
       page_(std::move(page)),
       gate_(std::move(gate)),
       workers_(limits, [work = std::move(handler)](HttpExchange& exchange) { work(exchange.request, exchange); }),
-      logins_(gate_) {
-  startDaemon(threads);
+      logins_(gate_),
+      reception_(connections_, [this](Newcomer&& newcomer) { admitNewcomer(std::move(newcomer)); }) {
+  daemon_ = startDaemon(Door::Http);
 }
 
-void HttpServer::Core::startDaemon(int threads) {
-  constexpr unsigned kFlags =
-      MHD_USE_EPOLL_INTERNAL_THREAD | MHD_USE_NO_LISTEN_SOCKET | MHD_ALLOW_SUSPEND_RESUME | MHD_USE_ERROR_LOG;
+MHD_Daemon* HttpServer::Core::startDaemon(Door door) const {
+  constexpr unsigned kFlags = MHD_USE_NO_LISTEN_SOCKET | MHD_ALLOW_SUSPEND_RESUME | MHD_USE_ERROR_LOG;
+  constexpr unsigned kPlainFlags = MHD_USE_EPOLL_INTERNAL_THREAD;
+  // With epoll the library spins while a handshake waits for its client.
+  constexpr unsigned kTlsFlags = MHD_USE_POLL_INTERNAL_THREAD | MHD_USE_TLS;
   // take() counts the connections; connections that are cut off and not yet closed must not keep new ones out.
   constexpr unsigned kMostConnections = 1U << 20;
   // Strings are compared by the header's rules for each: strict where leniency would let requests be smuggled.
   constexpr int kStrict = 1;
-  daemon_ = MHD_start_daemon(                                       //
-      kFlags, 0, nullptr, nullptr, &Core::onRequest, this,          //
-      MHD_OPTION_EXTERNAL_LOGGER, &Core::onLog, this,               //
-      MHD_OPTION_THREAD_POOL_SIZE, static_cast<unsigned>(threads),  //
-      MHD_OPTION_CONNECTION_LIMIT, kMostConnections,                //
-      MHD_OPTION_CONNECTION_MEMORY_LIMIT, limits_.headerBytes,      //
-      MHD_OPTION_STRICT_FOR_CLIENT, kStrict,                        //
-      MHD_OPTION_SIGPIPE_HANDLED_BY_APP, 1,                         //
-      MHD_OPTION_URI_LOG_CALLBACK, &Core::onRequestLine, this,      //
-      MHD_OPTION_NOTIFY_COMPLETED, &Core::onCompleted, this,        //
-      MHD_OPTION_NOTIFY_CONNECTION, &Core::onConnection, this, MHD_OPTION_END);
-  if (daemon_ == nullptr) throw std::runtime_error("the HTTP threads cannot be started");
+  MHD_OptionItem tls[] = {
+      {MHD_OPTION_HTTPS_PRIORITIES, 0, const_cast<char*>(kTlsPriorities)},
+      {MHD_OPTION_HTTPS_CERT_CALLBACK2, 0, reinterpret_cast<void*>(&noCertificate)},
+      {MHD_OPTION_END, 0, nullptr}};
+  const bool isTls = door == Door::Https;
+  auto* self = const_cast<Core*>(this);
+  MHD_Daemon* daemon = MHD_start_daemon(                                                        //
+      kFlags | (isTls ? kTlsFlags : kPlainFlags),                             //
+      0, nullptr, nullptr, &Core::onRequest, self,                                              //
+      MHD_OPTION_EXTERNAL_LOGGER, &Core::onLog, self,                                           //
+      MHD_OPTION_THREAD_POOL_SIZE, static_cast<unsigned>(threads_),                             //
+      MHD_OPTION_CONNECTION_LIMIT, kMostConnections,                                            //
+      MHD_OPTION_CONNECTION_MEMORY_LIMIT, limits_.headerBytes,                                  //
+      MHD_OPTION_STRICT_FOR_CLIENT, kStrict,                                                    //
+      MHD_OPTION_SIGPIPE_HANDLED_BY_APP, 1,                                                     //
+      MHD_OPTION_URI_LOG_CALLBACK, &Core::onRequestLine, self,                                  //
+      MHD_OPTION_NOTIFY_COMPLETED, &Core::onCompleted, self,                                    //
+      MHD_OPTION_NOTIFY_CONNECTION, &Core::onConnection, self,                                  //
+      MHD_OPTION_ARRAY, isTls ? tls : tls + std::size(tls) - 1, MHD_OPTION_END);
+  if (daemon == nullptr) throw std::runtime_error("the HTTP threads cannot be started");
+  return daemon;
 }
 
 HttpServer::Core::~Core() {
   workers_.giveUpAll();
   logins_.giveUpAll();
-  if (daemon_ != nullptr) MHD_stop_daemon(daemon_);
+  stopDaemons();
+}
+
+void HttpServer::Core::stopDaemons() {
+  for (MHD_Daemon** each : {&tlsDaemon_, &daemon_}) {
+    if (*each != nullptr) MHD_stop_daemon(std::exchange(*each, nullptr));
+  }
 }
 
 HttpLimits HttpServer::Core::limits() const {
@@ -164,19 +241,48 @@ void HttpServer::Core::setLimits(const HttpLimits& limits) {
   workers_.setLimits(limits);
 }
 
-void HttpServer::Core::take(int socket, const sockaddr_storage& peer, socklen_t peerSize) {
+template <typename Value>
+std::shared_ptr<const Value> HttpServer::Core::shared(const std::shared_ptr<const Value>& value) const {
+  const std::lock_guard lock(limitsMutex_);
+  return value;
+}
+
+void HttpServer::Core::setTls(std::shared_ptr<const TlsIdentity> identity) {
+  if (tlsDaemon_ == nullptr) tlsDaemon_ = startDaemon(Door::Https);
+  const std::lock_guard lock(limitsMutex_);
+  tls_ = std::move(identity);
+}
+
+void HttpServer::Core::setHostNames(const std::vector<std::string>& names) {
+  auto fresh = std::make_shared<const HostNames>(names);
+  const std::lock_guard lock(limitsMutex_);
+  names_ = std::move(fresh);
+}
+
+void HttpServer::Core::take(int socket, const sockaddr_storage& from, socklen_t peerSize, Door door) {
+  const sockaddr_storage peer = unmapped(from);
+  Newcomer newcomer{util::FileDescriptor(socket), from, peerSize, door, nullptr};
   if (connections_.count() >= limits().connections && !connections_.cutIdlest()) {
-    ZORVA_LOG_CLIENT(Warning, addressText(peer) + ": refused, since all connections have a request in work");
-    ::close(socket);
+    ZORVA_LOG_CLIENT(Warning, peerText(socket, peer) + ": refused, since all connections have a request in work");
     return;
   }
   // Added here because the library reports a new connection later, on its own thread.
-  connections_.add(socket, addressText(peer), clientOf(socket, peer));
-  if (MHD_add_connection(daemon_, socket, reinterpret_cast<const sockaddr*>(&peer), peerSize) != MHD_YES) {
-    ZORVA_LOG_CLIENT(Error, addressText(peer) + ": refused: " + std::strerror(errno));
-    // The library has closed the socket.
-    if (const auto refused = connections_.find(socket)) connections_.remove(*refused);
+  newcomer.connection = connections_.add(socket, peerText(socket, peer), clientOf(socket, peer),
+                                         originOf(socket, peer, door == Door::Https));
+  if (peer.ss_family == AF_UNIX) {
+    admitNewcomer(std::move(newcomer));
+  } else {
+    reception_.add(std::move(newcomer));
   }
+}
+
+void HttpServer::Core::admitNewcomer(Newcomer&& newcomer) {
+  MHD_Daemon* daemon = newcomer.door == Door::Https ? tlsDaemon_ : daemon_;
+  const auto* peer = reinterpret_cast<const sockaddr*>(&newcomer.peer);
+  // The library closes the socket, also if it refuses it.
+  if (MHD_add_connection(daemon, newcomer.socket.release(), peer, newcomer.peerSize) == MHD_YES) return;
+  ZORVA_LOG_CLIENT(Error, newcomer.connection->peer() + ": refused: " + std::strerror(errno));
+  connections_.remove(*newcomer.connection);
 }
 
 void HttpServer::Core::sweep() {
@@ -202,28 +308,38 @@ bool HttpServer::Core::stop() {
   waitUntil(Clock::now() + limits().drain);
   workers_.giveUpAll();
   waitUntil(Clock::now() + kLastAnswers);
-  MHD_stop_daemon(std::exchange(daemon_, nullptr));
+  stopDaemons();
   const bool isLoginDone = logins_.join(kLastAnswers);
   return workers_.join(kLastAnswers) && isLoginDone;
 }
 
 // ---- Called by the HTTP library ----
 
-void HttpServer::Core::onConnection(void* core, MHD_Connection* connection, void** context,
+void HttpServer::Core::onConnection(void* self, MHD_Connection* connection, void** context,
                                     MHD_ConnectionNotificationCode code) {
-  auto& connections = static_cast<Core*>(core)->connections_;
-  auto** own = reinterpret_cast<std::shared_ptr<Connection>**>(context);
+  Core& core = *static_cast<Core*>(self);
+  auto** own = reinterpret_cast<OpenConnection**>(context);
   if (code == MHD_CONNECTION_NOTIFY_STARTED) {
     const int socket = MHD_get_connection_info(connection, MHD_CONNECTION_INFO_CONNECTION_FD)->connect_fd;
-    *own = new std::shared_ptr<Connection>(connections.find(socket));
+    *own = new OpenConnection{core.connections_.find(socket), nullptr, false, false, {}};
+    if (const gnutls_session_t session = sessionOf(connection); session != nullptr) {
+      (*own)->tls = core.shared(core.tls_);
+      (*own)->tls->attach(session);
+      gnutls_session_set_ptr(session, *own);
+      gnutls_handshake_set_hook_function(session, GNUTLS_HANDSHAKE_FINISHED, GNUTLS_HOOK_POST, &onHandshakeFinished);
+    }
   } else if (*own != nullptr) {
-    connections.remove(***own);
+    // The library has freed the session.
+    if ((*own)->tls != nullptr && !(*own)->isSecured) {
+      ZORVA_LOG_CLIENT(Warning, (*own)->client->peer() + ": its TLS handshake failed");
+    }
+    core.connections_.remove(*(*own)->client);
     delete std::exchange(*own, nullptr);
   }
 }
 
 void* HttpServer::Core::onRequestLine(void*, const char* uri, MHD_Connection* connection) {
-  std::shared_ptr<Connection> client = connectionOf(connection);
+  std::shared_ptr<Connection> client = openConnectionOf(connection).client;
   // The first request's time has run since the connection was made.
   if (client->phase() == Phase::Idle) client->enter(Phase::Arriving);
   return new Holder(std::make_shared<HttpExchange>(connection, std::move(client), uri));
@@ -263,17 +379,54 @@ MHD_Result HttpServer::Core::readHead(Holder& exchange, MHD_Connection* connecti
       &request.headers);
   exchange->isHttp11 = std::strcmp(version, "HTTP/1.1") == 0;
 
-  const HttpLimits now = limits();
-  auto refusal = checkHead({request.method, request.path, version, request.headers}, now.bodyBytes);
-  if (!refusal) refusal = admit(*exchange);
-  if (refusal) {
+  if (const auto refusal = checkRequest(connection, *exchange, version)) {
     logRefusal(*exchange, *refusal);
     exchange->client->enter(Phase::Sending);
     return respondWith(connection, *refusal);
   }
-  exchange->takesGzip = now.gzip && listHas(request.headers, "Accept-Encoding", "gzip");
+  exchange->takesGzip = limits().gzip && listHas(request.headers, "Accept-Encoding", "gzip");
   request.takesTrailers = exchange->isHttp11 && listHas(request.headers, "TE", "trailers");
   return MHD_YES;
+}
+
+/// Whether the request may go on to its body.
+std::optional<Refusal> HttpServer::Core::checkRequest(MHD_Connection* connection, HttpExchange& exchange,
+                                                      const char* version) {
+  const HttpRequest& request = exchange.request;
+  OpenConnection& open = openConnectionOf(connection);
+  if (auto refusal = checkWebPage(open, request.headers)) return refusal;
+  if (auto refusal = checkHead({request.method, request.path, version, request.headers}, limits().bodyBytes)) {
+    return refusal;
+  }
+  if (auto refusal = identify(open, sessionOf(connection))) return refusal;
+  return admit(exchange);
+}
+
+/// No web page reaches a Unix socket, and programs that use one name any host.
+std::optional<Refusal> HttpServer::Core::checkWebPage(OpenConnection& connection, const HeaderList& headers) {
+  Connection& client = *connection.client;
+  if (client.origin().way == access::Origin::Way::UnixSocket) return std::nullopt;
+  const std::string* host = findHeader(headers, MHD_HTTP_HEADER_HOST);
+  if (host != nullptr && *host != client.knownHost) {
+    const bool isOwn = shared(names_)->has(*host) ||
+                       (connection.tls != nullptr && connection.tls->covers(std::string(util::withoutPort(*host))));
+    if (!isOwn) return foreignHost(*host);
+    client.knownHost = *host;
+  }
+  return checkOrigin(headers, connection.tls != nullptr ? "https" : "http");
+}
+
+/// Looks at the client's certificate when the first request comes: the handshake is over then.
+std::optional<Refusal> HttpServer::Core::identify(OpenConnection& connection, gnutls_session_t session) {
+  if (connection.tls == nullptr) return std::nullopt;
+  if (!connection.isIdentified) {
+    PeerCertificate peer = connection.tls->checkPeer(session);
+    if (peer.certificate.has_value()) connection.client->setCertificate(std::move(*peer.certificate));
+    connection.refusal = std::move(peer.refusal);
+    connection.isIdentified = true;
+  }
+  if (connection.refusal.empty()) return std::nullopt;
+  return Refusal{403, connection.refusal, {}};
 }
 
 /// Finds out who the client is. The page for people is shown to everybody.
@@ -402,7 +555,7 @@ void HttpServer::Core::onLog(void*, const char* format, va_list arguments) {
   if (!isLogged(Level::Warning)) return;
   char text[512];
   std::vsnprintf(text, sizeof text, format, arguments);
-  ZORVA_LOG_CLIENT(Warning, withoutLineEnd(text));
+  if (!isNoise(text)) ZORVA_LOG_CLIENT(Warning, withoutLineEnd(text));
 }
 
 // ---- HttpServer ----
@@ -413,9 +566,17 @@ HttpServer::HttpServer(const HttpLimits& limits, int threads, Handler handler, s
 
 HttpServer::~HttpServer() = default;
 
-void HttpServer::take(int socket, const sockaddr_storage& peer, socklen_t peerSize) {
-  core_->take(socket, peer, peerSize);
+void HttpServer::take(int socket, const sockaddr_storage& peer, socklen_t peerSize, Door door) {
+  core_->take(socket, peer, peerSize, door);
 }
+
+int HttpServer::newcomers() const { return core_->newcomers(); }
+
+void HttpServer::look() { core_->look(); }
+
+void HttpServer::setTls(std::shared_ptr<const TlsIdentity> identity) { core_->setTls(std::move(identity)); }
+
+void HttpServer::setHostNames(const std::vector<std::string>& names) { core_->setHostNames(names); }
 
 void HttpServer::setLimits(const HttpLimits& limits) { core_->setLimits(limits); }
 

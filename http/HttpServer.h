@@ -11,10 +11,13 @@
 #include <functional>
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "access/Gate.h"
+#include "http/Door.h"
 #include "http/Exchange.h"
 #include "http/HttpLimits.h"
+#include "http/TlsIdentity.h"
 #include "util/NotCopied.h"
 
 namespace zorva::http {
@@ -35,8 +38,19 @@ class HttpServer : util::NotCopied {
 
   /// Takes over a connected stream socket, non-blocking and close-on-exec, and closes it in the end. If the limit on
   /// connections is reached, the connection that is idle for longest is cut off; if none is idle, the new one is
-  /// closed.
-  void take(int socket, const sockaddr_storage& peer, socklen_t peerSize);
+  /// closed. Door::Https needs setTls(). Call take(), look() and setTls() on one thread.
+  void take(int socket, const sockaddr_storage& peer, socklen_t peerSize, Door door = Door::Http);
+
+  /// A descriptor that is readable when look() has something to do: a new connection has sent its first byte.
+  int newcomers() const;
+  void look();
+
+  /// The certificate, key and authorities of new connections. Open connections keep theirs. Throws std::runtime_error
+  /// if the threads cannot be started.
+  void setTls(std::shared_ptr<const TlsIdentity> identity);
+
+  /// Further names of this host that the header Host may have.
+  void setHostNames(const std::vector<std::string>& names);
 
   /// The limits for requests from now on; the size of headers does not change.
   void setLimits(const HttpLimits& limits);

@@ -76,8 +76,10 @@ class Server {
  private:
   void run() {
     while (!ending_) {
-      pollfd wait{listeners_[0].socket.get(), POLLIN, 0};
-      ::poll(&wait, 1, 20);
+      pollfd waits[] = {{listeners_[0].socket.get(), POLLIN, 0}, {server_.newcomers(), POLLIN, 0}};
+      const pollfd& wait = waits[0];
+      ::poll(waits, std::size(waits), 20);
+      server_.look();
       for (;;) {
         sockaddr_storage peer{};
         socklen_t size = sizeof peer;
@@ -130,7 +132,7 @@ TEST(HttpServer, RequestsThatComeAtOnceAreAnsweredInTheirOrder) {
 TEST(HttpServer, ABodyMayComeInChunksAndInPieces) {
   Server server(echo);
   Wire wire(server.port());
-  ASSERT_TRUE(wire.send("POST /x HTTP/1.1\r\nHost: x\r\nTransfer-Encoding: chunked\r\n\r\n"));
+  ASSERT_TRUE(wire.send("POST /x HTTP/1.1\r\nHost: localhost\r\nTransfer-Encoding: chunked\r\n\r\n"));
   for (const char* piece : {"3\r\nab", "c\r\n", "A;ext=1\r\n0123456789\r", "\n0\r\n", "\r\n"}) {
     std::this_thread::sleep_for(milliseconds(5));
     ASSERT_TRUE(wire.send(piece));
@@ -141,7 +143,7 @@ TEST(HttpServer, ABodyMayComeInChunksAndInPieces) {
 TEST(HttpServer, ExpectationsAreMetBeforeTheBody) {
   Server server(echo);
   Wire wire(server.port());
-  ASSERT_TRUE(wire.send("POST /x HTTP/1.1\r\nHost: x\r\nContent-Length: 2\r\nExpect: 100-continue\r\n\r\n"));
+  ASSERT_TRUE(wire.send("POST /x HTTP/1.1\r\nHost: localhost\r\nContent-Length: 2\r\nExpect: 100-continue\r\n\r\n"));
   EXPECT_EQ(wire.receive().status, 100);
   ASSERT_TRUE(wire.send("ok"));
   EXPECT_EQ(wire.receive().body, "ok");
@@ -394,7 +396,7 @@ TEST(HttpServer, ABodyThatGrowsTooLongIsRefused) {
   limits.bodyBytes = 1000;
   Server server(echo, limits);
   Wire wire(server.port());
-  std::string request = "POST /x HTTP/1.1\r\nHost: x\r\nTransfer-Encoding: chunked\r\n\r\n";
+  std::string request = "POST /x HTTP/1.1\r\nHost: localhost\r\nTransfer-Encoding: chunked\r\n\r\n";
   for (int i = 0; i < 20; ++i) request += "64\r\n" + std::string(100, 'x') + "\r\n";
   ASSERT_TRUE(wire.send(request + "0\r\n\r\n"));
   const WireResponse response = wire.receive();
@@ -410,7 +412,7 @@ TEST(HttpServer, UnfinishedBodiesTogetherTakeNoMoreThanTheirShare) {
   std::vector<std::unique_ptr<Wire>> hoarders;
   for (int i = 0; i < 6; ++i) {
     hoarders.push_back(std::make_unique<Wire>(server.port()));
-    ASSERT_TRUE(hoarders.back()->send("POST /x HTTP/1.1\r\nHost: x\r\nContent-Length: 100000\r\n\r\n" +
+    ASSERT_TRUE(hoarders.back()->send("POST /x HTTP/1.1\r\nHost: localhost\r\nContent-Length: 100000\r\n\r\n" +
                                       std::string(99'000, 'x')));
     std::this_thread::sleep_for(milliseconds(20));
   }
@@ -427,7 +429,7 @@ TEST(HttpServer, ARequestThatTricklesInIsCutOffInTime) {
   Wire inHead(server.port());
   Wire inBody(server.port());
   ASSERT_TRUE(inHead.send("POST /x HT"));
-  ASSERT_TRUE(inBody.send("POST /x HTTP/1.1\r\nHost: x\r\nContent-Length: 1000\r\n\r\n"));
+  ASSERT_TRUE(inBody.send("POST /x HTTP/1.1\r\nHost: localhost\r\nContent-Length: 1000\r\n\r\n"));
   const auto start = std::chrono::steady_clock::now();
   bool headOpen = true;
   bool bodyOpen = true;
@@ -499,8 +501,8 @@ TEST(HttpServer, AThousandSlowAndHalfOpenClientsLeaveAWorkingOneUnharmed) {
   ASSERT_TRUE(working.send(testing::posting("before")));
   ASSERT_EQ(working.receive().body, "before");
 
-  constexpr const char* kBeginnings[] = {"", "POST /cimom HT", "POST /x HTTP/1.1\r\nHost: x\r\nX-Slow: ",
-                                         "POST /x HTTP/1.1\r\nHost: x\r\nContent-Length: 5000\r\n\r\n<?xml"};
+  constexpr const char* kBeginnings[] = {"", "POST /cimom HT", "POST /x HTTP/1.1\r\nHost: localhost\r\nX-Slow: ",
+                                         "POST /x HTTP/1.1\r\nHost: localhost\r\nContent-Length: 5000\r\n\r\n<?xml"};
   std::vector<std::unique_ptr<Wire>> slow;
   for (int i = 0; i < 1000; ++i) {
     slow.push_back(std::make_unique<Wire>(server.port()));
@@ -518,7 +520,7 @@ TEST(HttpServer, AThousandSlowAndHalfOpenClientsLeaveAWorkingOneUnharmed) {
 TEST(HttpServer, OptionsListTheServersCapabilities) {
   Server server(echo);
   Wire wire(server.port());
-  ASSERT_TRUE(wire.send("OPTIONS * HTTP/1.1\r\nHost: x\r\n\r\n"));
+  ASSERT_TRUE(wire.send("OPTIONS * HTTP/1.1\r\nHost: localhost\r\n\r\n"));
   const WireResponse response = wire.receive();
   EXPECT_EQ(response.status, 200);
   EXPECT_EQ(response.headers.at("allow"), "POST, M-POST, OPTIONS");
@@ -542,12 +544,12 @@ TEST(HttpServer, HeaderFieldsWithoutAValueAreSent) {
 TEST(HttpServer, TheRootSaysToAPersonWhatThisIs) {
   Server server(echo, {}, "This is a server.\n");
   Wire wire(server.port());
-  ASSERT_TRUE(wire.send("GET / HTTP/1.1\r\nHost: x\r\n\r\n"));
+  ASSERT_TRUE(wire.send("GET / HTTP/1.1\r\nHost: localhost\r\n\r\n"));
   const WireResponse page = wire.receive();
   EXPECT_EQ(page.status, 200);
   EXPECT_EQ(page.headers.at("content-type"), "text/plain; charset=utf-8");
   EXPECT_EQ(page.body, "This is a server.\n");
-  ASSERT_TRUE(wire.send("HEAD / HTTP/1.1\r\nHost: x\r\nConnection: close\r\n\r\n"));
+  ASSERT_TRUE(wire.send("HEAD / HTTP/1.1\r\nHost: localhost\r\nConnection: close\r\n\r\n"));
   const std::string head = wire.take(10000, seconds(20));
   EXPECT_THAT(head, ::testing::StartsWith("HTTP/1.1 200 "));
   EXPECT_THAT(head, ::testing::EndsWith("\r\n\r\n"));
@@ -556,12 +558,12 @@ TEST(HttpServer, TheRootSaysToAPersonWhatThisIs) {
 TEST(HttpServer, OtherMethodsAreTurnedDown) {
   Server server(echo);
   Wire get(server.port());
-  ASSERT_TRUE(get.send("GET /cimom HTTP/1.1\r\nHost: x\r\n\r\n"));
+  ASSERT_TRUE(get.send("GET /cimom HTTP/1.1\r\nHost: localhost\r\n\r\n"));
   const WireResponse response = get.receive();
   EXPECT_EQ(response.status, 405);
   EXPECT_EQ(response.headers.at("allow"), "POST, M-POST, OPTIONS");
   Wire brew(server.port());
-  ASSERT_TRUE(brew.send("BREW / HTTP/1.1\r\nHost: x\r\n\r\n"));
+  ASSERT_TRUE(brew.send("BREW / HTTP/1.1\r\nHost: localhost\r\n\r\n"));
   EXPECT_EQ(brew.receive().status, 501);
 }
 

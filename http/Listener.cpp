@@ -5,6 +5,8 @@
 #include <netinet/in.h>
 #include <netinet/tcp.h>
 #include <sys/socket.h>
+#include <sys/stat.h>
+#include <sys/un.h>
 #include <unistd.h>
 
 #include <cerrno>
@@ -50,26 +52,15 @@ std::optional<sockaddr_storage> parse(const std::string& text, int port) {
   return std::nullopt;
 }
 
-bool isLoopback(const sockaddr_storage& address) {
-  if (address.ss_family == AF_INET) {
-    sockaddr_in v4{};
-    std::memcpy(&v4, &address, sizeof v4);
-    return (ntohl(v4.sin_addr.s_addr) >> 24) == 127;
-  }
-  sockaddr_in6 v6{};
-  std::memcpy(&v6, &address, sizeof v6);
-  return address.ss_family == AF_INET6 && IN6_IS_ADDR_LOOPBACK(&v6.sin6_addr);
-}
-
-sockaddr_storage parseLoopback(const std::string& text, int port) {
+sockaddr_storage parseFor(Door door, const std::string& text, int port) {
   const auto address = parse(text, port);
   if (!address.has_value()) {
     throw std::invalid_argument("'" + text + "' is no address to listen on; give one such as 127.0.0.1 or ::1");
   }
-  if (!isLoopback(*address)) {
+  if (door == Door::Http && !isLoopback(*address)) {
     throw std::invalid_argument("'" + text +
-                                "' is no loopback address: this server does not ask who its clients are, "
-                                "so it listens on 127.0.0.1 and ::1 only");
+                                "' is no loopback address: plain HTTP is for this host only, on 127.0.0.1 and ::1; "
+                                "for other hosts set certificate, key and addresses in [tls]");
   }
   return *address;
 }
@@ -91,8 +82,12 @@ int portOf(const sockaddr_storage& address) {
   return ntohs(v4.sin_port);
 }
 
+std::string urlOf(Door door, const sockaddr_storage& address) {
+  return (door == Door::Https ? "https://" : "http://") + addressText(address);
+}
+
 /// Listens on one address. On a failure the descriptor is empty and errno has the reason.
-Listener listenOnOne(const sockaddr_storage& address) {
+Listener listenOnOne(const sockaddr_storage& address, Door door) {
   Listener listener;
   const int socket = ::socket(address.ss_family, SOCK_STREAM | SOCK_NONBLOCK | SOCK_CLOEXEC, 0);
   if (socket < 0) return listener;
@@ -103,16 +98,18 @@ Listener listenOnOne(const sockaddr_storage& address) {
   if (::bind(socket, reinterpret_cast<const sockaddr*>(&address), sizeOf(address)) != 0) return listener;
   if (::listen(socket, SOMAXCONN) != 0) return listener;
   listener.socket = std::move(owned);
-  listener.url = "http://" + addressText(nameOf(socket));
+  listener.url = urlOf(door, nameOf(socket));
+  listener.door = door;
+  listener.isLocal = isLoopback(address);
   return listener;
 }
 
 /// One try at all addresses. Empty if a port that was chosen for the first is in use at another.
-std::vector<Listener> listenOnce(const Addresses& addresses, int port, bool mayLack) {
+std::vector<Listener> listenOnce(const Addresses& addresses, int port, Door door, bool mayLack) {
   std::vector<Listener> listeners;
   int chosen = port;
   for (const std::string& text : addresses) {
-    Listener listener = listenOnOne(parseLoopback(text, chosen));
+    Listener listener = listenOnOne(parseFor(door, text, chosen), door);
     if (!listener.socket) {
       const int error = errno;
       if (mayLack && (error == EADDRNOTAVAIL || error == EAFNOSUPPORT)) continue;
@@ -127,40 +124,116 @@ std::vector<Listener> listenOnce(const Addresses& addresses, int port, bool mayL
   return listeners;
 }
 
-}  // namespace
-
-void checkAddresses(const Addresses& addresses) {
-  for (const std::string& text : addresses) parseLoopback(text, 0);
+sockaddr_un unixAddress(const std::string& path) {
+  sockaddr_un address{};
+  address.sun_family = AF_UNIX;
+  if (path.empty() || path.size() >= sizeof address.sun_path) {
+    throw std::runtime_error("cannot listen on " + path + ": the path of a socket has at most " +
+                             std::to_string(sizeof address.sun_path - 1) + " bytes");
+  }
+  std::memcpy(address.sun_path, path.data(), path.size());
+  return address;
 }
 
-std::vector<Listener> listenOn(const std::optional<Addresses>& addresses, int port) {
+/// Removes the file of a server that has died. Throws if a server listens there, or the file is no socket.
+void removeStale(const std::string& path, const sockaddr_un& address) {
+  struct stat file {};
+  if (::lstat(path.c_str(), &file) != 0) return;
+  if (!S_ISSOCK(file.st_mode)) throw std::runtime_error("cannot listen on " + path + ": there is a file, and no socket");
+  const util::FileDescriptor probe(::socket(AF_UNIX, SOCK_STREAM | SOCK_NONBLOCK | SOCK_CLOEXEC, 0));
+  const int rc = ::connect(probe.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address);
+  if (rc == 0 || errno != ECONNREFUSED) {
+    throw std::runtime_error("cannot listen on " + path + ": another server listens there");
+  }
+  ::unlink(path.c_str());
+}
+
+/// The path of a Unix socket; the name of an abstract one with a leading '@'.
+std::string pathOf(const sockaddr_storage& address) {
+  sockaddr_un name{};
+  std::memcpy(&name, &address, sizeof name);
+  const bool isAbstract = name.sun_path[0] == '\0';
+  const char* text = name.sun_path + (isAbstract ? 1 : 0);
+  return (isAbstract ? "@" : "") + std::string(text, ::strnlen(text, sizeof name.sun_path - 1));
+}
+
+Listener adopt(int descriptor, const std::string& name, std::optional<int> tlsPort) {
+  Listener listener{util::FileDescriptor(descriptor), {}};
+  const std::string what = "the socket that was handed over as descriptor " + std::to_string(descriptor);
+  int listens = 0;
+  socklen_t size = sizeof listens;
+  const int rc = ::getsockopt(descriptor, SOL_SOCKET, SO_ACCEPTCONN, &listens, &size);
+  if (rc != 0 || listens == 0) throw std::runtime_error(what + " does not listen");
+  const sockaddr_storage address = nameOf(descriptor);
+  if (address.ss_family == AF_UNIX) {
+    listener.url = "unix:" + pathOf(address);
+  } else {
+    if (name == "https" && !tlsPort.has_value()) {
+      throw std::runtime_error(what + " is for HTTPS, but [tls] has no certificate");
+    }
+    listener.door = name == "https" || tlsPort == portOf(address) ? Door::Https : Door::Http;
+    listener.isLocal = isLoopback(address);
+    listener.url = urlOf(listener.door, address);
+  }
+  if (listener.door == Door::Http && !listener.isLocal) {
+    throw std::runtime_error(what + " listens elsewhere than on a loopback address, and plain HTTP is for this host only");
+  }
+  ::fcntl(descriptor, F_SETFD, FD_CLOEXEC);
+  ::fcntl(descriptor, F_SETFL, ::fcntl(descriptor, F_GETFL) | O_NONBLOCK);
+  return listener;
+}
+
+}  // namespace
+
+SocketFile::SocketFile(std::string path) : path_(std::move(path)) {
+  struct stat file {};
+  if (::lstat(path_.c_str(), &file) != 0) return;
+  device_ = file.st_dev;
+  number_ = file.st_ino;
+}
+
+SocketFile::~SocketFile() {
+  struct stat file {};
+  if (::lstat(path_.c_str(), &file) != 0 || file.st_dev != device_ || file.st_ino != number_) return;
+  ::unlink(path_.c_str());
+}
+
+void checkAddresses(const Addresses& addresses, Door door) {
+  for (const std::string& text : addresses) parseFor(door, text, 0);
+}
+
+std::vector<Listener> listenOn(const std::optional<Addresses>& addresses, int port, Door door) {
   const Addresses wanted = addresses.value_or(Addresses{"127.0.0.1", "::1"});
   for (int i = 0; i < kPortTries; ++i) {
-    std::vector<Listener> listeners = listenOnce(wanted, port, !addresses.has_value());
+    std::vector<Listener> listeners = listenOnce(wanted, port, door, !addresses.has_value());
     if (!listeners.empty()) return listeners;
   }
   throw std::runtime_error("no port is free on all addresses");
 }
 
-std::vector<Listener> adoptListeners(int count) {
+Listener listenOnUnix(const std::string& path) {
+  constexpr mode_t kForAll = 0666;
+  const sockaddr_un address = unixAddress(path);
+  removeStale(path, address);
+  Listener listener;
+  listener.socket = util::FileDescriptor(::socket(AF_UNIX, SOCK_STREAM | SOCK_NONBLOCK | SOCK_CLOEXEC, 0));
+  const int socket = listener.socket.get();
+  // Nobody can connect before listen(), so nobody sees other rights.
+  if (::bind(socket, reinterpret_cast<const sockaddr*>(&address), sizeof address) != 0 ||
+      ::chmod(path.c_str(), kForAll) != 0 || ::listen(socket, SOMAXCONN) != 0) {
+    throw std::runtime_error("cannot listen on " + path + ": " + errorText(errno));
+  }
+  listener.url = "unix:" + path;
+  listener.file = std::make_unique<SocketFile>(path);
+  return listener;
+}
+
+std::vector<Listener> adoptListeners(const Inherited& inherited, std::optional<int> tlsPort) {
   std::vector<Listener> listeners;
-  for (int descriptor = kFirstInherited; descriptor < kFirstInherited + count; ++descriptor) {
-    Listener listener{util::FileDescriptor(descriptor), {}};
-    const std::string name = "the socket that was handed over as descriptor " + std::to_string(descriptor);
-    int listens = 0;
-    socklen_t size = sizeof listens;
-    const int rc = ::getsockopt(descriptor, SOL_SOCKET, SO_ACCEPTCONN, &listens, &size);
-    if (rc != 0 || listens == 0) throw std::runtime_error(name + " does not listen");
-    const sockaddr_storage address = nameOf(descriptor);
-    if (!isLoopback(address)) {
-      throw std::runtime_error(name +
-                               " listens elsewhere than on a loopback address, and this server does not ask who "
-                               "its clients are");
-    }
-    ::fcntl(descriptor, F_SETFD, FD_CLOEXEC);
-    ::fcntl(descriptor, F_SETFL, ::fcntl(descriptor, F_GETFL) | O_NONBLOCK);
-    listener.url = "http://" + addressText(address);
-    listeners.push_back(std::move(listener));
+  for (int i = 0; i < inherited.count; ++i) {
+    const auto place = static_cast<std::size_t>(i);
+    const std::string name = place < inherited.names.size() ? inherited.names[place] : std::string();
+    listeners.push_back(adopt(kFirstInherited + i, name, tlsPort));
   }
   return listeners;
 }

@@ -54,7 +54,7 @@ std::string_view withoutPrefix(std::string_view name) {
 /// Header fields that a request may have at most once: those that decide how it is read, and those of CIM.
 bool isSingle(std::string_view name) {
   constexpr std::string_view kSingle[] = {"Host", "Content-Length", "Transfer-Encoding", "Content-Type",
-                                          "Man",  "Authorization",  "Content-Encoding"};
+                                          "Man",  "Authorization",  "Content-Encoding",  "Origin"};
   return std::any_of(std::begin(kSingle), std::end(kSingle), [&](auto each) { return util::sameName(each, name); }) ||
          util::sameName(name.substr(0, 3), "CIM");
 }

@@ -77,6 +77,7 @@ Config configOf(const CommandLine& line) {
   if (!line.agentConfig.empty()) config.agentConfig = absolute(line.agentConfig);
   if (!line.providerDirectory.empty()) config.providerDirectory = absolute(line.providerDirectory);
   if (config.addresses.has_value()) http::checkAddresses(*config.addresses);
+  if (config.tlsAddresses.has_value()) http::checkAddresses(*config.tlsAddresses, http::Door::Https);
   return config;
 }
 

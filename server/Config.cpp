@@ -37,7 +37,28 @@ void readListen(Config& config, const util::TomlDocument& document) {
   util::TomlTable listen(document, "listen");
   listen.take("addresses", config.addresses, "expected a list of addresses such as [\"127.0.0.1\"]");
   listen.take("port", config.port, 0, 65535);
+  listen.take("socket", config.socket);
+  if (config.socket.has_value()) config.socket = util::pathFrom(config.file, *config.socket);
+  std::optional<std::vector<std::string>> names;
+  listen.take("names", names, "expected a list of host names such as [\"host1.example.org\"]");
+  config.names = names.value_or(config.names);
   listen.finish();
+}
+
+void readTls(Config& config, const util::TomlDocument& document) {
+  util::TomlTable tls(document, "tls");
+  http::TlsFiles& files = config.tls;
+  tls.take("certificate", files.certificate);
+  tls.take("key", files.key);
+  tls.take("client_ca", files.clientCa);
+  tls.take("addresses", config.tlsAddresses, "expected a list of addresses such as [\"0.0.0.0\", \"::\"]");
+  tls.take("port", config.tlsPort, 0, 65535);
+  tls.finish();
+  if (files.certificate.empty() && !files.key.empty()) tls.fail("key", "needs tls.certificate");
+  if (files.certificate.empty() && !files.clientCa.empty()) tls.fail("client_ca", "needs tls.certificate and tls.key");
+  if (files.certificate.empty() && config.tlsAddresses) tls.fail("addresses", "needs tls.certificate and tls.key");
+  if (!files.certificate.empty() && files.key.empty()) tls.fail("certificate", "needs tls.key");
+  for (std::string* each : {&files.certificate, &files.key, &files.clientCa}) *each = util::pathFrom(config.file, *each);
 }
 
 void readLimits(Config& config, const util::TomlDocument& document) {
@@ -143,10 +164,11 @@ std::string contentsOf(const std::string& path) {
 
 Config parseConfig(const std::string& path, const std::string& text) try {
   const util::TomlDocument document(text);
-  document.refuseAllBut({"listen", "limits", "http", "pull", "agent", "access", "audit", "log"});
+  document.refuseAllBut({"listen", "tls", "limits", "http", "pull", "agent", "access", "audit", "log"});
   Config config;
   config.file = path;
   readListen(config, document);
+  readTls(config, document);
   readLimits(config, document);
   readHttp(config, document);
   readPull(config, document);

@@ -11,9 +11,12 @@
 #include "agent/config/Config.h"
 #include "http/HttpLimits.h"
 #include "http/Listener.h"
+#include "http/TlsIdentity.h"
 #include "util/LogLevels.h"
 
 namespace zorva::server {
+
+inline constexpr const char* kDefaultSocket = "/run/zorvacimd/cim.sock";
 
 struct Config {
   std::string file;  ///< the file; empty for the built-in defaults
@@ -21,7 +24,14 @@ struct Config {
   // [listen]
   /// Absent: 127.0.0.1 and ::1; the host may lack one of them.
   std::optional<http::Addresses> addresses;
-  int port = 5988;  ///< 0: a free one
+  int port = 5988;                    ///< 0: a free one
+  std::optional<std::string> socket;  ///< a Unix socket; empty: none; absent: kDefaultSocket, where that can be made
+  std::vector<std::string> names;     ///< further names of this host that clients may use
+
+  // [tls]
+  http::TlsFiles tls;  ///< without a certificate: no TLS
+  std::optional<http::Addresses> tlsAddresses;
+  int tlsPort = 5989;
 
   /// [limits]
   http::HttpLimits limits;

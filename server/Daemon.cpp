@@ -14,9 +14,11 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <ctime>
 #include <filesystem>
 #include <stdexcept>
 #include <system_error>
+#include <tuple>
 #include <utility>
 #include <vector>
 
@@ -31,6 +33,8 @@
 #include "schema/Schema.h"
 #include "server/AuditLog.h"
 #include "server/BrokerLog.h"
+#include "server/CertificateInUse.h"
+#include "server/Entrances.h"
 #include "server/Systemd.h"
 #include "util/FileDescriptor.h"
 
@@ -44,6 +48,7 @@ constexpr int kWrongUsage = 2;
 
 constexpr int kSweepMilliseconds = 200;
 constexpr int kQuietMilliseconds = 10'000;
+constexpr int kDayMilliseconds = 24 * 60 * 60 * 1000;
 constexpr std::chrono::milliseconds kBeforeTrim{400};
 constexpr std::chrono::milliseconds kNoDescriptors{100};
 
@@ -115,18 +120,13 @@ void mendSettings() noexcept {
   }
 }
 
-/// The address in its shortest form, for people.
-std::string shortUrl(const std::string& url) {
-  return url.starts_with("http://127.0.0.1:") ? "http://localhost" + url.substr(16) : url;
-}
-
-/// The response to GET of "/".
-std::string pageText(const std::string& url) {
-  return "This is zorvacimd " ZORVA_VERSION
-         ", a CIM server: it publishes the DNS client configuration of this host.\n"
-         "Programs ask it by CIM-XML over HTTP POST (DSP0200), which a browser does not speak. These do:\n\n"
-         "  wbemcli ein " +
-         url + "/root/cimv2:ZORVA_DNSProtocolEndPoint\n  zorvactl --url " + url + "/root/cimv2 show\n";
+/// Whether they differ in what only a start applies.
+bool needsRestart(const Config& before, const Config& after) {
+  const auto fixed = [](const Config& config) {
+    return std::tuple(config.addresses, config.port, config.socket, config.tls.certificate.empty(), config.tlsAddresses,
+                      config.tlsPort, config.threads, config.nesting, config.providerDirectory);
+  };
+  return fixed(before) != fixed(after);
 }
 
 class Daemon {
@@ -155,6 +155,7 @@ class Daemon {
   std::unique_ptr<cimom::Service> service_;
   std::shared_ptr<access::LoginGate> gate_;
   std::unique_ptr<http::HttpServer> server_;
+  CertificateInUse certificate_;
   Clock::time_point acceptAgain_{};
   std::size_t requestsSeen_ = 0;     ///< at the last look
   std::size_t requestsTrimmed_ = 0;  ///< when memory was last given back to the system
@@ -171,52 +172,48 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
   if (!signals_) throw std::runtime_error(std::string("cannot wait for signals: ") + std::strerror(errno));
 
   audit_ = std::make_unique<AuditLog>(auditWriter(config_));
-  const int inherited = countOfInheritedSockets();
-  listeners_ = inherited > 0 ? http::adoptListeners(inherited) : http::listenOn(config_.addresses, config_.port);
+  gate_ = makeGate(config_);
+  listeners_ = openListeners(config_, gate_->hasUsers());
   broker_ = makeBroker(config_);
   cimom::ServiceOptions options = serviceOptions(config_);
   options.audit = [this](const access::AuditRecord& record) { audit_->take(record); };
   service_ = std::make_unique<cimom::Service>(*broker_, std::move(options));
-  gate_ = makeGate(config_);
   warnOfOpenAccess(config_);
   server_ = std::make_unique<http::HttpServer>(
       config_.limits, config_.threads,
       [service = service_.get()](const http::HttpRequest& request, http::ResponseSink& sink) {
         service->handle(request, sink);
       },
-      pageText(shortUrl(listeners_.front().url)), gate_);
+      pageOf(listeners_), gate_);
+  server_->setHostNames(config_.names);
+  if (!config_.tls.certificate.empty()) certificate_.use(config_.tls, *server_);
 }
 
 void Daemon::greet() const {
   const bool isTerminal = ::isatty(STDOUT_FILENO) == 1;
   if (!commandLine_.greet && !isTerminal && config_.port != 0) return;
-  std::string text = "zorvacimd listens on ";
-  for (const http::Listener& each : listeners_) text += (&each == listeners_.data() ? "" : " and ") + each.url;
-  text += '\n';
-  if (commandLine_.greet || isTerminal) {
-    const std::string url = shortUrl(listeners_.front().url);
-    text += "ask it:  wbemcli ein " + url + "/root/cimv2:ZORVA_DNSProtocolEndPoint\n";
-    text += "    or:  zorvactl --url " + url + "/root/cimv2 show\n";
-    if (config_.access.anonymous == access::Role::Read) {
-      text +=
-          "It shows everything and changes nothing; with --anonymous operate every user of this host may change it.\n";
-    }
+  const bool hasHints = commandLine_.greet || isTerminal;
+  std::string text = greetingOf(listeners_, hasHints);
+  if (hasHints && config_.access.anonymous == access::Role::Read) {
+    text += "It shows everything and changes nothing; with --anonymous operate every user of this host may change it.\n";
   }
   std::fputs(text.c_str(), stdout);
   std::fflush(stdout);
 }
 
 bool Daemon::run() {
-  std::vector<pollfd> waits{{signals_.get(), POLLIN, 0}};
+  std::vector<pollfd> waits{{signals_.get(), POLLIN, 0}, {server_->newcomers(), POLLIN, 0}};
+  const std::size_t others = waits.size();
   for (const http::Listener& each : listeners_) waits.push_back({each.socket.get(), POLLIN, 0});
   notifyServiceManager("READY=1");
   greet();
   for (;;) {
     const bool accepts = Clock::now() >= acceptAgain_;
-    const int ready = ::poll(waits.data(), accepts ? waits.size() : 1, timeout());
+    const int ready = ::poll(waits.data(), accepts ? waits.size() : others, timeout());
     if (ready > 0 && waits[0].revents != 0 && !handleSignal()) break;
-    for (std::size_t i = 1; ready > 0 && accepts && i < waits.size(); ++i) {
-      if (waits[i].revents != 0) acceptFrom(listeners_[i - 1]);
+    if (ready > 0 && waits[1].revents != 0) server_->look();
+    for (std::size_t i = others; ready > 0 && accepts && i < waits.size(); ++i) {
+      if (waits[i].revents != 0) acceptFrom(listeners_[i - others]);
     }
     lookAfter();
   }
@@ -233,7 +230,7 @@ void Daemon::acceptFrom(const http::Listener& listener) {
     const int socket =
         ::accept4(listener.socket.get(), reinterpret_cast<sockaddr*>(&peer), &size, SOCK_NONBLOCK | SOCK_CLOEXEC);
     if (socket >= 0) {
-      server_->take(socket, peer, size);
+      server_->take(socket, peer, size, listener.door);
       continue;
     }
     if (errno == EMFILE || errno == ENFILE || errno == ENOBUFS || errno == ENOMEM) {
@@ -264,9 +261,10 @@ void Daemon::reload() try {
   warnOfOpenAccess(fresh);
   makeRoomForConnections(fresh.limits);
   server_->setLimits(fresh.limits);
-  if (fresh.addresses != config_.addresses || fresh.port != config_.port || fresh.threads != config_.threads ||
-      fresh.nesting != config_.nesting || fresh.providerDirectory != config_.providerDirectory) {
-    ZORVA_LOG(Warning, "addresses, port, threads, nesting and provider directory change with the next start");
+  server_->setHostNames(fresh.names);
+  if (certificate_.exists() && !fresh.tls.certificate.empty()) certificate_.renew(fresh.tls, *server_);
+  if (needsRestart(config_, fresh)) {
+    ZORVA_LOG(Warning, "addresses, port, socket, threads, nesting and provider directory change with the next start");
   }
   config_ = std::move(fresh);
   ZORVA_LOG(Warning, "the configuration was read again");
@@ -279,6 +277,7 @@ void Daemon::reload() try {
 /// Periodic work.
 void Daemon::lookAfter() {
   server_->sweep();
+  certificate_.lookAfter();
   service_->reclaim();
   gate_->refresh();
   const std::size_t requests = server_->requestsTaken();
@@ -296,7 +295,8 @@ int Daemon::timeout() const {
   if (server_->isBusy() || requestsTrimmed_ != server_->requestsTaken() || Clock::now() < acceptAgain_) {
     return kSweepMilliseconds;
   }
-  return requestsTrimmed_ == 0 ? -1 : kQuietMilliseconds;
+  if (requestsTrimmed_ != 0) return kQuietMilliseconds;
+  return certificate_.exists() ? kDayMilliseconds : -1;
 }
 
 /// Opens the log at its target. A file that did not exist is removed again: the server may run as another user.
@@ -321,6 +321,13 @@ void tryProviders(const Config& config, const MakeBroker& makeBroker, std::vecto
   for (std::string& each : makeBroker(config)->openLibraries()) problems.push_back(std::move(each));
 }
 
+/// Reads the certificate and warns if it expires soon.
+void tryCertificate(const Config& config) {
+  if (config.tls.certificate.empty()) return;
+  const auto warning = expiryWarning(*http::TlsIdentity::load(config.tls), std::time(nullptr));
+  if (warning.has_value()) tellError("warning: " + *warning);
+}
+
 template <typename Step>
 void attempt(std::vector<std::string>& problems, const std::string& what, Step&& step) {
   try {
@@ -336,8 +343,12 @@ int check(const Config& config, const MakeBroker& makeBroker) {
   std::vector<std::string> problems;
   attempt(problems, "log.target: ", [&] { tryLog(config); });
   attempt(problems, "audit.file: ", [&] { auditWriter(config); });
+  attempt(problems, "", [&] { tryCertificate(config); });
   tryProviders(config, makeBroker, problems);
-  attempt(problems, "access.users: ", [&] { makeGate(config); });
+  attempt(problems, "access.users: ", [&] {
+    const bool hasUsers = makeGate(config)->hasUsers();
+    attempt(problems, "", [&] { checkLogins(config, hasUsers); });
+  });
   for (const std::string& each : problems) tellError(each);
   if (!problems.empty()) return kCannotServe;
   std::printf("%s: good\n", config.file.empty() ? "the built-in configuration" : config.file.c_str());

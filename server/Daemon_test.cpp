@@ -51,7 +51,7 @@ TEST(Daemon, AnswersWithTheInstancesOfTheHost) {
 TEST(Daemon, SaysToABrowserWhatItIsAndHowToAskIt) {
   const TestDaemon daemon;
   Wire wire(daemon.port());
-  wire.send("GET / HTTP/1.1\r\nHost: x\r\n\r\n");
+  wire.send("GET / HTTP/1.1\r\nHost: localhost\r\n\r\n");
   const WireResponse page = wire.receive();
   EXPECT_EQ(page.status, 200);
   EXPECT_THAT(page.body, HasSubstr("This is zorvacimd "));
@@ -197,7 +197,7 @@ struct Hostile {
 };
 
 std::string withHead(const std::string& fields, const std::string& body = {}) {
-  return "POST /cimom HTTP/1.1\r\nHost: x\r\n" + fields + "\r\n" + body;
+  return "POST /cimom HTTP/1.1\r\nHost: localhost\r\n" + fields + "\r\n" + body;
 }
 
 std::vector<Hostile> hostileRequests() {
@@ -218,7 +218,7 @@ std::vector<Hostile> hostileRequests() {
       {"HugeChunk", withHead(chunked, "ffffffffffffffffff\r\n"), 413, "413"},
       {"HugeLength", withHead("Content-Length: 123456789012\r\n"), 413, "413"},
       {"NoHost", "POST /cimom HTTP/1.1\r\nContent-Length: 0\r\n\r\n", 400, "400"},
-      {"TwoHosts", withHead("Host: y\r\nContent-Length: 0\r\n"), 400, "Host"},
+      {"TwoHosts", withHead("Host: localhost\r\nContent-Length: 0\r\n"), 400, "Host"},
       {"NoLength", withHead(""), 411, "411"},
       {"OtherCharset", withHead("Content-Type: text/xml; charset=utf-16\r\nContent-Length: 0\r\n"), 400, "charset"},
       {"OtherContent", withHead("Content-Type: application/json\r\nContent-Length: 0\r\n"), 415, "415"},
@@ -226,7 +226,7 @@ std::vector<Hostile> hostileRequests() {
        withHead("CIMObject: root/cimv2\r\nCIMObject: interop\r\nContent-Type: text/xml\r\nContent-Length: 0\r\n"), 400,
        "CIMObject"},
       {"HugeHeader", withHead("X: " + std::string(70'000, 'x') + "\r\nContent-Length: 0\r\n"), 431, "431"},
-      {"HugePath", "POST /" + std::string(70'000, 'x') + " HTTP/1.1\r\nHost: x\r\n\r\n", 414, "414"},
+      {"HugePath", "POST /" + std::string(70'000, 'x') + " HTTP/1.1\r\nHost: localhost\r\n\r\n", 414, "414"},
       {"ManyHeaders", withHead([] {
          std::string fields;
          for (int i = 0; i < 5000; ++i) fields += "X-" + std::to_string(i) + ": 1\r\n";
@@ -234,7 +234,7 @@ std::vector<Hostile> hostileRequests() {
        }()),
        431, "431"},
       {"NoHttp", std::string("\x16\x03\x01\x02\x00\x01\x00\x01\xfc\x03\x03\r\n\r\n", 15), -1, nullptr},
-      {"OtherVersion", "POST /cimom HTTP/3.0\r\nHost: x\r\nContent-Length: 0\r\n\r\n", 505, nullptr},
+      {"OtherVersion", "POST /cimom HTTP/3.0\r\nHost: localhost\r\nContent-Length: 0\r\n\r\n", 505, nullptr},
   };
 }
 
@@ -287,7 +287,7 @@ TEST(HostileRequests, AFloodOfThemDoesNotFillTheLog) {
   const TestDaemon daemon;
   for (int i = 0; i < 300; ++i) {
     Wire wire(daemon.port());
-    wire.send("GET /cimom HTTP/1.1\r\nHost: x\r\n\r\n");
+    wire.send("GET /cimom HTTP/1.1\r\nHost: localhost\r\n\r\n");
     EXPECT_EQ(wire.receive().status, 405);
   }
   const std::string log = daemon.log();
@@ -524,7 +524,7 @@ TEST(DaemonProcess, AThousandHalfOpenClientsCostLittleMemoryAndNoDescriptors) {
   std::vector<std::unique_ptr<Wire>> slow;
   for (int i = 0; i < 1000; ++i) {
     slow.push_back(std::make_unique<Wire>(daemon.port()));
-    slow.back()->send("POST /cimom HTTP/1.1\r\nHost: x\r\nContent-Length: 1000\r\n\r\n<CIM");
+    slow.back()->send("POST /cimom HTTP/1.1\r\nHost: localhost\r\nContent-Length: 1000\r\n\r\n<CIM");
     if (i % 100 != 0) continue;
     EXPECT_THAT(endpoints(daemon.port()), HasSubstr("eth0")) << i;
   }

@@ -10,6 +10,8 @@
 #include <cstdlib>
 #include <cstring>
 #include <string>
+#include <string_view>
+#include <vector>
 
 #include "util/FileDescriptor.h"
 
@@ -26,6 +28,17 @@ long number(const char* text) {
   const char* const end = text + std::strlen(text);
   const auto [rest, error] = std::from_chars(text, end, value);
   return error == std::errc() && rest == end ? value : -1;
+}
+
+/// The texts between colons.
+std::vector<std::string> parts(const char* text) {
+  std::vector<std::string> found;
+  for (std::string_view rest = text == nullptr ? "" : text; !rest.empty();) {
+    const std::size_t colon = std::min(rest.find(':'), rest.size());
+    found.emplace_back(rest.substr(0, colon));
+    rest.remove_prefix(std::min(colon + 1, rest.size()));
+  }
+  return found;
 }
 
 }  // namespace
@@ -47,11 +60,15 @@ void notifyServiceManager(std::string_view state) {
            addressSize);
 }
 
-int countOfInheritedSockets() {
-  const bool forUs = number(std::getenv("LISTEN_PID")) == static_cast<long>(::getpid());
-  const long count = forUs ? number(std::getenv("LISTEN_FDS")) : 0;
+http::Inherited inheritedSockets() {
+  http::Inherited inherited;
+  if (number(std::getenv("LISTEN_PID")) == static_cast<long>(::getpid())) {
+    const long count = number(std::getenv("LISTEN_FDS"));
+    inherited.count = static_cast<int>(std::clamp(count, 0L, static_cast<long>(kMostSockets)));
+    inherited.names = parts(std::getenv("LISTEN_FDNAMES"));
+  }
   for (const char* name : {"LISTEN_PID", "LISTEN_FDS", "LISTEN_FDNAMES"}) ::unsetenv(name);
-  return static_cast<int>(std::clamp(count, 0L, static_cast<long>(kMostSockets)));
+  return inherited;
 }
 
 }  // namespace zorva::server

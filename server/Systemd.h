@@ -5,13 +5,15 @@
 
 #include <string_view>
 
+#include "http/Listener.h"
+
 namespace zorva::server {
 
 /// Sends the service manager, if there is one, lines such as "READY=1". Failures are ignored.
 void notifyServiceManager(std::string_view state);
 
-/// How many listening sockets the service manager has passed on, from descriptor 3 on. Removes the variables from the
-/// environment, so that no child takes the sockets for its own.
-int countOfInheritedSockets();
+/// The listening sockets that the service manager has passed on. Removes the variables from the environment, so that no
+/// child takes the sockets for its own.
+http::Inherited inheritedSockets();
 
 }  // namespace zorva::server
