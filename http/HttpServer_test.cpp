@@ -17,6 +17,7 @@
 #include "agent/testing/TemporaryDirectory.h"
 #include "http/Listener.h"
 #include "http/RequestHead.h"
+#include "http/testing/TestServer.h"
 #include "http/testing/TestWire.h"
 
 namespace zorva::http {
@@ -25,6 +26,7 @@ namespace {
 using std::chrono::milliseconds;
 using std::chrono::seconds;
 using ::testing::HasSubstr;
+using testing::Server;
 using testing::Wire;
 using testing::WireResponse;
 
@@ -55,46 +57,6 @@ class Gate {
   std::mutex mutex_;
   std::condition_variable changed_;
   bool isOpen_ = false;
-};
-
-/// An HTTP server on a free port, with a thread that accepts and sweeps.
-class Server {
- public:
-  explicit Server(HttpServer::Handler handler, const HttpLimits& limits = {}, std::string page = {},
-                  std::shared_ptr<access::Gate> gate = std::make_shared<access::OpenGate>(access::Role::Operate))
-      : listeners_(listenOn(Addresses{"127.0.0.1"}, 0)),
-        server_(limits, 2, std::move(handler), std::move(page), std::move(gate)),
-        thread_([this] { run(); }) {}
-  ~Server() {
-    ending_ = true;
-    thread_.join();
-  }
-
-  int port() const { return std::stoi(listeners_[0].url.substr(listeners_[0].url.rfind(':') + 1)); }
-  HttpServer& http() { return server_; }
-
- private:
-  void run() {
-    while (!ending_) {
-      pollfd waits[] = {{listeners_[0].socket.get(), POLLIN, 0}, {server_.newcomers(), POLLIN, 0}};
-      const pollfd& wait = waits[0];
-      ::poll(waits, std::size(waits), 20);
-      server_.look();
-      for (;;) {
-        sockaddr_storage peer{};
-        socklen_t size = sizeof peer;
-        const int socket = ::accept4(wait.fd, reinterpret_cast<sockaddr*>(&peer), &size, SOCK_NONBLOCK | SOCK_CLOEXEC);
-        if (socket < 0) break;
-        server_.take(socket, peer, size);
-      }
-      server_.sweep();
-    }
-  }
-
-  std::vector<Listener> listeners_;
-  HttpServer server_;
-  std::atomic<bool> ending_ = false;
-  std::thread thread_;
 };
 
 /// Answers with the request's body.

@@ -139,7 +139,8 @@ sockaddr_un unixAddress(const std::string& path) {
 void removeStale(const std::string& path, const sockaddr_un& address) {
   struct stat file {};
   if (::lstat(path.c_str(), &file) != 0) return;
-  if (!S_ISSOCK(file.st_mode)) throw std::runtime_error("cannot listen on " + path + ": there is a file, and no socket");
+  if (!S_ISSOCK(file.st_mode))
+    throw std::runtime_error("cannot listen on " + path + ": there is a file, and no socket");
   const util::FileDescriptor probe(::socket(AF_UNIX, SOCK_STREAM | SOCK_NONBLOCK | SOCK_CLOEXEC, 0));
   const int rc = ::connect(probe.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address);
   if (rc == 0 || errno != ECONNREFUSED) {
@@ -176,7 +177,8 @@ Listener adopt(int descriptor, const std::string& name, std::optional<int> tlsPo
     listener.url = urlOf(listener.door, address);
   }
   if (listener.door == Door::Http && !listener.isLocal) {
-    throw std::runtime_error(what + " listens elsewhere than on a loopback address, and plain HTTP is for this host only");
+    throw std::runtime_error(what +
+                             " listens elsewhere than on a loopback address, and plain HTTP is for this host only");
   }
   ::fcntl(descriptor, F_SETFD, FD_CLOEXEC);
   ::fcntl(descriptor, F_SETFL, ::fcntl(descriptor, F_GETFL) | O_NONBLOCK);
@@ -185,17 +187,14 @@ Listener adopt(int descriptor, const std::string& name, std::optional<int> tlsPo
 
 }  // namespace
 
-SocketFile::SocketFile(std::string path) : path_(std::move(path)) {
-  struct stat file {};
-  if (::lstat(path_.c_str(), &file) != 0) return;
-  device_ = file.st_dev;
-  number_ = file.st_ino;
-}
+SocketFile::SocketFile(std::string path) : path_(std::move(path)) { ::lstat(path_.c_str(), &made_); }
 
 SocketFile::~SocketFile() {
-  struct stat file {};
-  if (::lstat(path_.c_str(), &file) != 0 || file.st_dev != device_ || file.st_ino != number_) return;
-  ::unlink(path_.c_str());
+  struct stat now {};
+  // A new file may have the number of one that was removed.
+  const bool isSame = ::lstat(path_.c_str(), &now) == 0 && now.st_dev == made_.st_dev && now.st_ino == made_.st_ino &&
+                      now.st_mtim.tv_sec == made_.st_mtim.tv_sec && now.st_mtim.tv_nsec == made_.st_mtim.tv_nsec;
+  if (isSame) ::unlink(path_.c_str());
 }
 
 void checkAddresses(const Addresses& addresses, Door door) {

@@ -3,6 +3,8 @@
 // The sockets on which the server waits for clients. Plain HTTP is for this host only: loopback addresses (127.0.0.0/8
 // and ::1) and a Unix socket. HTTPS may listen on any address.
 
+#include <sys/stat.h>
+
 #include <memory>
 #include <optional>
 #include <string>
@@ -25,8 +27,7 @@ class SocketFile : util::NotCopied {
 
  private:
   const std::string path_;
-  unsigned long device_ = 0;
-  unsigned long number_ = 0;
+  struct stat made_ {};
 };
 
 /// One listening socket, non-blocking and close-on-exec.

@@ -4,6 +4,7 @@
 
 #include <cstdio>
 #include <stdexcept>
+#include <string_view>
 #include <utility>
 
 #include "util/ReadFile.h"
@@ -37,7 +38,7 @@ std::string taken(gnutls_datum_t& datum) {
   return text;
 }
 
-/// "The certificate is NOT trusted. The certificate chain uses expired certificate. "
+/// "The certificate chain uses expired certificate"
 std::string problemsOf(unsigned int status) {
   gnutls_datum_t text{};
   if (gnutls_certificate_verification_status_print(status, GNUTLS_CRT_X509, &text, 0) != 0) return "it is not trusted";
@@ -45,7 +46,8 @@ std::string problemsOf(unsigned int status) {
   while (!sentence.empty() && (sentence.back() == ' ' || sentence.back() == '\n' || sentence.back() == '.')) {
     sentence.pop_back();
   }
-  return sentence;
+  constexpr std::string_view kFirst = "The certificate is NOT trusted. ";
+  return sentence.starts_with(kFirst) ? sentence.substr(kFirst.size()) : sentence;
 }
 
 std::string subjectOf(gnutls_x509_crt_t certificate) {
@@ -109,13 +111,15 @@ void TlsIdentity::readKey(const TlsFiles& files) {
   if ((text.mode & kReadableByOthers) != 0) {
     char mode[8];
     std::snprintf(mode, sizeof mode, "%04o", text.mode & 07777U);
-    fail(files.key, std::string("all users may read this private key (mode ") + mode + "): chmod 0640 lets its owner and group only");
+    fail(files.key, std::string("all users may read this private key (mode ") + mode +
+                        "): chmod 0640 lets its owner and group only");
   }
   const gnutls_datum_t certificate = datumOf(chain_);
   const gnutls_datum_t key = datumOf(text.text);
   const int rc =
       gnutls_certificate_set_x509_key_mem2(credentials_.get(), &certificate, &key, GNUTLS_X509_FMT_PEM, nullptr, 0);
-  if (rc == GNUTLS_E_CERTIFICATE_KEY_MISMATCH) fail(files.key, "is not the key of the certificate " + files.certificate);
+  if (rc == GNUTLS_E_CERTIFICATE_KEY_MISMATCH)
+    fail(files.key, "is not the key of the certificate " + files.certificate);
   if (rc < 0) fail(files.key, std::string("has no private key in PEM that fits: ") + gnutls_strerror(rc));
 }
 

@@ -16,9 +16,10 @@ Examples:
   zorvacimd --listen ::1 --log-level 4500       on one address, with a log line for each request
   zorvacimd --anonymous operate                 every user of this host may change settings
   zorvacimd --config my.toml --check-config     is that configuration good?
+  zorvacimd --make-certificate                  a certificate for HTTPS, where there is none
 
-It listens on loopback addresses only. SIGHUP reads the configuration again, SIGTERM ends it when the requests in work
-are done. Exit status: 0 ended as it was told to, 1 it cannot serve, 2 wrong usage or configuration.)";
+Plain HTTP is for this host only; other hosts use HTTPS ([tls] in the configuration). SIGHUP reads the configuration
+and the certificate again, SIGTERM ends it when the requests in work are done. Exit status: 0 ended as it was told to, 1 it cannot serve, 2 wrong usage or configuration.)";
 
 void addOptions(CLI::App& app, CommandLine& line) {
   app.add_option("--config", line.configFile, "The configuration (default: /etc/zorvagent/zorvacimd.toml)")
@@ -42,6 +43,8 @@ void addOptions(CLI::App& app, CommandLine& line) {
       ->type_name("FILE");
   app.add_option("--provider-dir", line.providerDirectory, "Where the provider libraries lie")->type_name("DIR");
   app.add_flag("--check-config", line.checkConfig, "Tell whether the configuration is good, and end");
+  app.add_flag("--make-certificate", line.makeCertificate,
+               "Write a self-signed certificate for HTTPS and its key, print its fingerprint, and end");
   app.add_flag("--greet", line.greet, "Print how to ask this server something, as on a terminal");
 }
 

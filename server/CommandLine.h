@@ -18,8 +18,9 @@ struct CommandLine {
   std::optional<std::string> anonymous;  ///< the word of a role
   std::string agentConfig;
   std::string providerDirectory;
-  bool checkConfig = false;  ///< read the configuration, report whether it is valid, and end
-  bool greet = false;        ///< print on standard output how to send this server a request
+  bool checkConfig = false;      ///< read the configuration, report whether it is valid, and end
+  bool makeCertificate = false;  ///< write a self-signed certificate, and end
+  bool greet = false;            ///< print on standard output how to send this server a request
 };
 
 /// A text to print instead of serving.

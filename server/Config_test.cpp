@@ -43,6 +43,14 @@ TEST_F(ServerConfig, EveryKeyIsRead) {
 [listen]
 addresses = ["127.0.0.2", "::1"]
 port = 5990
+socket = "cim.sock"
+names = ["www.example.org"]
+[tls]
+certificate = "server.crt"
+key = "/etc/server.key"
+addresses = ["0.0.0.0"]
+port = 5991
+client_ca = "ca.crt"
 [limits]
 body_kib = 8
 bodies_mib = 9
@@ -79,6 +87,11 @@ target = "server.log"
 )");
   EXPECT_THAT(config.addresses.value(), ElementsAre("127.0.0.2", "::1"));
   EXPECT_EQ(config.port, 5990);
+  EXPECT_EQ(config.socket, directory_ / "cim.sock");
+  EXPECT_THAT(config.names, ElementsAre("www.example.org"));
+  EXPECT_EQ(config.tls, (http::TlsFiles{directory_ / "server.crt", "/etc/server.key", directory_ / "ca.crt"}));
+  EXPECT_THAT(config.tlsAddresses.value(), ElementsAre("0.0.0.0"));
+  EXPECT_EQ(config.tlsPort, 5991);
   EXPECT_EQ(config.limits.bodyBytes, 8U << 10);
   EXPECT_EQ(config.limits.bodiesBytes, 9U << 20);
   EXPECT_EQ(config.limits.headerBytes, 16U << 10);
@@ -106,6 +119,19 @@ target = "server.log"
   EXPECT_EQ(config.access.otherLocal, access::Role::None);
   EXPECT_EQ(config.logLevel, 4500);
   EXPECT_EQ(config.logTarget, directory_ / "server.log");
+}
+
+TEST_F(ServerConfig, TlsNeedsACertificateAndAKey) {
+  EXPECT_EQ(wrong("[tls]\ncertificate = \"c\"\n"), "zorvacimd.toml:2: tls.certificate: needs tls.key");
+  EXPECT_EQ(wrong("[tls]\nkey = \"k\"\n"), "zorvacimd.toml:2: tls.key: needs tls.certificate");
+  EXPECT_EQ(wrong("[tls]\nclient_ca = \"c\"\n"), "zorvacimd.toml:2: tls.client_ca: needs tls.certificate and tls.key");
+  EXPECT_EQ(wrong("[tls]\naddresses = [\"::\"]\n"),
+            "zorvacimd.toml:2: tls.addresses: needs tls.certificate and tls.key");
+}
+
+TEST_F(ServerConfig, AnEmptySocketIsNone) {
+  EXPECT_EQ(read("[listen]\nsocket = \"\"\n").socket, "");
+  EXPECT_FALSE(read("[listen]\n").socket.has_value());
 }
 
 TEST_F(ServerConfig, TheExampleHasEveryKeyWithItsDefault) {
@@ -159,7 +185,7 @@ TEST_F(ServerConfig, AnErrorNamesFileLineAndKey) {
   EXPECT_EQ(wrong("[listen]\nport = 65536\n"), "zorvacimd.toml:2: listen.port: must be from 0 to 65535");
   EXPECT_EQ(wrong("[listen]\naddresses = []\n"),
             "zorvacimd.toml:2: listen.addresses: expected a list of addresses such as [\"127.0.0.1\"]");
-  EXPECT_EQ(wrong("\n[tls]\n"), "zorvacimd.toml:2: tls: is not a known table or key");
+  EXPECT_EQ(wrong("\n[ssl]\n"), "zorvacimd.toml:2: ssl: is not a known table or key");
   EXPECT_EQ(wrong("http = 1\n"), "zorvacimd.toml:1: http: expected a table");
   EXPECT_EQ(wrong("[limits]\narrival_seconds = 0\n"),
             "zorvacimd.toml:2: limits.arrival_seconds: must be from 1 to 86400");

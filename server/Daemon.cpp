@@ -35,6 +35,7 @@
 #include "server/BrokerLog.h"
 #include "server/CertificateInUse.h"
 #include "server/Entrances.h"
+#include "server/MakeCertificate.h"
 #include "server/Systemd.h"
 #include "util/FileDescriptor.h"
 
@@ -358,6 +359,10 @@ int check(const Config& config, const MakeBroker& makeBroker) {
 int serve(const CommandLine& commandLine, const MakeBroker& makeBroker) {
   Config config = configOf(commandLine);
   if (commandLine.checkConfig) return check(config, makeBroker);
+  if (commandLine.makeCertificate) {
+    makeCertificate(config);
+    return kServed;
+  }
   // Few heaps for all threads: with more, each thread would hold its own memory.
   ::mallopt(M_ARENA_MAX, 2);
   zorva::agent::loadConfig(config.agentConfig);

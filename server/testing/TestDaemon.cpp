@@ -54,6 +54,14 @@ std::string firstLine(int descriptor, std::chrono::seconds most) {
   return text;
 }
 
+/// The port of the first address of that scheme; 0 if there is none.
+int portIn(const std::string& line, const std::string& scheme) {
+  const std::size_t begin = line.find(scheme);
+  if (begin == std::string::npos) return 0;
+  const std::size_t end = line.find_first_of(" \n", begin);
+  return std::atoi(line.c_str() + line.rfind(':', end) + 1);
+}
+
 }  // namespace
 
 TestDaemon::TestDaemon(const std::string& config, std::vector<std::string> arguments,
@@ -79,12 +87,11 @@ TestDaemon::TestDaemon(const std::string& config, std::vector<std::string> argum
   out = util::FileDescriptor();
 
   const std::string line = firstLine(out_.get(), std::chrono::seconds(60));
-  const std::size_t end = line.find_first_of(" \n", line.find("http://"));
-  const std::size_t colon = line.rfind(':', end);
-  if (line.find("http://") == std::string::npos) {
+  port_ = portIn(line, "http://");
+  tlsPort_ = portIn(line, "https://");
+  if (line.find("zorvacimd listens on ") == std::string::npos) {
     throw std::runtime_error("zorvacimd does not listen: " + line + contentsOf(directory_ / "stderr"));
   }
-  port_ = std::atoi(line.c_str() + colon + 1);
 }
 
 TestDaemon::~TestDaemon() {

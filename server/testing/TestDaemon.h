@@ -33,6 +33,8 @@ class TestDaemon : util::NotCopied {
   ~TestDaemon();
 
   int port() const { return port_; }
+  /// The port of HTTPS; 0: none.
+  int tlsPort() const { return tlsPort_; }
   pid_t process() const { return process_; }
   const zorva::agent::testing::TemporaryDirectory& directory() const { return directory_; }
 
@@ -55,6 +57,7 @@ class TestDaemon : util::NotCopied {
   pid_t process_ = -1;
   util::FileDescriptor out_;
   int port_ = 0;
+  int tlsPort_ = 0;
 };
 
 }  // namespace zorva::server::testing
