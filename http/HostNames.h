@@ -1,8 +1,8 @@
 #pragma once
 
-// Keeps web pages out. A browser sends requests of any page that its user looks at, also to this host: by an address, or
-// by a name of the page's owner that leads here (DNS rebinding). Such requests name another host in the header Host, or
-// the page in the header Origin.
+// Keeps web pages out. A browser sends requests of any page that its user looks at, also to this host: by an address,
+// or by a name of the page's owner that leads here (DNS rebinding). Such requests name another host in the header Host,
+// or the page in the header Origin.
 
 #include <optional>
 #include <string>

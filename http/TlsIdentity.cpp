@@ -31,18 +31,11 @@ gnutls_datum_t datumOf(const std::string& text) {
   return {reinterpret_cast<unsigned char*>(const_cast<char*>(text.data())), static_cast<unsigned int>(text.size())};
 }
 
-/// Text that GnuTLS has allocated.
-std::string taken(gnutls_datum_t& datum) {
-  std::string text(reinterpret_cast<const char*>(datum.data), datum.size);
-  gnutls_free(datum.data);
-  return text;
-}
-
 /// "The certificate chain uses expired certificate"
 std::string problemsOf(unsigned int status) {
   gnutls_datum_t text{};
   if (gnutls_certificate_verification_status_print(status, GNUTLS_CRT_X509, &text, 0) != 0) return "it is not trusted";
-  std::string sentence = taken(text);
+  std::string sentence = takeText(text);
   while (!sentence.empty() && (sentence.back() == ' ' || sentence.back() == '\n' || sentence.back() == '.')) {
     sentence.pop_back();
   }
@@ -50,9 +43,9 @@ std::string problemsOf(unsigned int status) {
   return sentence.starts_with(kFirst) ? sentence.substr(kFirst.size()) : sentence;
 }
 
-std::string subjectOf(gnutls_x509_crt_t certificate) {
+std::string subjectOf(const X509Certificate& certificate) {
   gnutls_datum_t text{};
-  return gnutls_x509_crt_get_dn3(certificate, &text, 0) == 0 ? taken(text) : std::string();
+  return gnutls_x509_crt_get_dn3(certificate.get(), &text, 0) == 0 ? takeText(text) : std::string();
 }
 
 /// What is wrong with the chain of a client's certificate; empty if it is good.
@@ -68,11 +61,11 @@ std::string whyNotTrusted(gnutls_session_t session) {
 
 }  // namespace
 
-std::string fingerprintOf(gnutls_x509_crt_t certificate) {
+std::string fingerprintOf(const X509Certificate& certificate) {
   constexpr std::size_t kBytes = 32;
   unsigned char hash[kBytes];
   std::size_t size = sizeof hash;
-  if (gnutls_x509_crt_get_fingerprint(certificate, GNUTLS_DIG_SHA256, hash, &size) != 0) return {};
+  if (gnutls_x509_crt_get_fingerprint(certificate.get(), GNUTLS_DIG_SHA256, hash, &size) != 0) return {};
   std::string text;
   for (const unsigned char byte : hash) {
     char digits[3];
@@ -85,7 +78,7 @@ std::string fingerprintOf(gnutls_x509_crt_t certificate) {
 std::shared_ptr<const TlsIdentity> TlsIdentity::load(const TlsFiles& files) {
   std::shared_ptr<TlsIdentity> identity(new TlsIdentity());
   gnutls_certificate_credentials_t credentials = nullptr;
-  if (gnutls_certificate_allocate_credentials(&credentials) != 0) throw std::bad_alloc();
+  checkGnutls(gnutls_certificate_allocate_credentials(&credentials));
   identity->credentials_.reset(credentials);
   identity->readCertificate(files.certificate);
   identity->readKey(files);
@@ -95,15 +88,13 @@ std::shared_ptr<const TlsIdentity> TlsIdentity::load(const TlsFiles& files) {
 
 void TlsIdentity::readCertificate(const std::string& file) {
   chain_ = readPem(file).text;
-  gnutls_x509_crt_t certificate = nullptr;
-  if (gnutls_x509_crt_init(&certificate) != 0) throw std::bad_alloc();
-  own_.reset(certificate);
+  own_ = newCertificate();
   const gnutls_datum_t pem = datumOf(chain_);
-  const int rc = gnutls_x509_crt_import(certificate, &pem, GNUTLS_X509_FMT_PEM);
+  const int rc = gnutls_x509_crt_import(own_.get(), &pem, GNUTLS_X509_FMT_PEM);
   if (rc != 0) fail(file, std::string("has no certificate in PEM: ") + gnutls_strerror(rc));
-  fingerprint_ = fingerprintOf(certificate);
-  validFrom_ = gnutls_x509_crt_get_activation_time(certificate);
-  validUntil_ = gnutls_x509_crt_get_expiration_time(certificate);
+  fingerprint_ = fingerprintOf(own_);
+  validFrom_ = gnutls_x509_crt_get_activation_time(own_.get());
+  validUntil_ = gnutls_x509_crt_get_expiration_time(own_.get());
 }
 
 void TlsIdentity::readKey(const TlsFiles& files) {
@@ -143,10 +134,8 @@ PeerCertificate TlsIdentity::checkPeer(gnutls_session_t session) const {
   if (chain == nullptr || count == 0) return {};
   const std::string why = whyNotTrusted(session);
   if (!why.empty()) return {std::nullopt, "the client certificate is refused: " + why};
-  gnutls_x509_crt_t certificate = nullptr;
-  if (gnutls_x509_crt_init(&certificate) != 0) throw std::bad_alloc();
-  const std::unique_ptr<gnutls_x509_crt_int, Free> owner(certificate);
-  if (gnutls_x509_crt_import(certificate, &chain[0], GNUTLS_X509_FMT_DER) != 0) {
+  const X509Certificate certificate = newCertificate();
+  if (gnutls_x509_crt_import(certificate.get(), &chain[0], GNUTLS_X509_FMT_DER) != 0) {
     return {std::nullopt, "the client certificate is refused: it cannot be read"};
   }
   return {access::Certificate{subjectOf(certificate), fingerprintOf(certificate)}, {}};

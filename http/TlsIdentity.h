@@ -3,15 +3,13 @@
 // The server's side of TLS: its certificate and key, and the authorities whose client certificates it asks for. An
 // object never changes; a reload makes another one. Thread-safe.
 
-#include <gnutls/gnutls.h>
-#include <gnutls/x509.h>
-
 #include <ctime>
 #include <memory>
 #include <optional>
 #include <string>
 
 #include "access/Origin.h"
+#include "http/GnutlsHandles.h"
 #include "util/NotCopied.h"
 
 namespace zorva::http {
@@ -64,16 +62,9 @@ class TlsIdentity : util::NotCopied {
   void readKey(const TlsFiles& files);
   void readAuthorities(const std::string& file);
 
-  struct Free {
-    void operator()(gnutls_certificate_credentials_st* credentials) const {
-      gnutls_certificate_free_credentials(credentials);
-    }
-    void operator()(gnutls_x509_crt_int* certificate) const { gnutls_x509_crt_deinit(certificate); }
-  };
-
   std::string chain_;  ///< in PEM
-  std::unique_ptr<gnutls_certificate_credentials_st, Free> credentials_;
-  std::unique_ptr<gnutls_x509_crt_int, Free> own_;
+  TlsCredentials credentials_;
+  X509Certificate own_;
   std::string fingerprint_;
   bool asksForCertificate_ = false;
   std::time_t validFrom_ = 0;
@@ -81,6 +72,6 @@ class TlsIdentity : util::NotCopied {
 };
 
 /// The SHA-256 fingerprint of a certificate: 64 lower-case hexadecimal digits; empty if it cannot be computed.
-std::string fingerprintOf(gnutls_x509_crt_t certificate);
+std::string fingerprintOf(const X509Certificate& certificate);
 
 }  // namespace zorva::http

@@ -148,10 +148,13 @@ TEST_F(ServerConfig, TheExampleHasEveryKeyWithItsDefault) {
     text += line.substr(2) + "\n";
     ++keys;
   }
-  EXPECT_EQ(keys, 29U);
+  EXPECT_EQ(keys, 35U);
   const Config config = read(text);
   const Config defaults;
   EXPECT_EQ(config.port, defaults.port);
+  EXPECT_EQ(config.socket, kDefaultSocket);
+  EXPECT_EQ(config.tls, defaults.tls);
+  EXPECT_EQ(config.tlsPort, defaults.tlsPort);
   EXPECT_EQ(config.limits.bodyBytes, defaults.limits.bodyBytes);
   EXPECT_EQ(config.limits.bodiesBytes, defaults.limits.bodiesBytes);
   EXPECT_EQ(config.limits.headerBytes, defaults.limits.headerBytes);

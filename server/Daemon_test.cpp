@@ -109,15 +109,7 @@ TEST(Daemon, TheCentralInstancesAreThoseThatConformToTheProfile) {
 /// Changes the domain of eth0.
 std::string change(int port) {
   Wire wire(port);
-  wire.send(http::testing::posting(
-      "<?xml version=\"1.0\" encoding=\"utf-8\"?><CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.0\">"
-      "<MESSAGE ID=\"1\" PROTOCOLVERSION=\"1.0\"><SIMPLEREQ><IMETHODCALL NAME=\"SetProperty\"><LOCALNAMESPACEPATH>"
-      "<NAMESPACE NAME=\"root\"/><NAMESPACE NAME=\"cimv2\"/></LOCALNAMESPACEPATH><IPARAMVALUE NAME=\"InstanceName\">"
-      "<INSTANCENAME CLASSNAME=\"ZORVA_DNSProtocolEndPoint\"><KEYBINDING NAME=\"Name\"><KEYVALUE>eth0</KEYVALUE>"
-      "</KEYBINDING></INSTANCENAME></IPARAMVALUE><IPARAMVALUE NAME=\"PropertyName\"><VALUE>DomainName</VALUE>"
-      "</IPARAMVALUE><IPARAMVALUE NAME=\"NewValue\"><VALUE>example.net</VALUE></IPARAMVALUE></IMETHODCALL></SIMPLEREQ>"
-      "</MESSAGE></CIM>",
-      "CIMOperation: MethodCall\r\nCIMMethod: SetProperty\r\nCIMObject: root/cimv2\r\n"));
+  wire.send(testing::changeOfDomain());
   return wire.receive().body;
 }
 

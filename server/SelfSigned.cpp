@@ -3,7 +3,6 @@
 #include <arpa/inet.h>
 #include <fcntl.h>
 #include <gnutls/crypto.h>
-#include <gnutls/x509.h>
 #include <grp.h>
 #include <sys/stat.h>
 #include <unistd.h>
@@ -14,6 +13,7 @@
 #include <memory>
 #include <stdexcept>
 
+#include "http/GnutlsHandles.h"
 #include "http/TlsIdentity.h"
 #include "util/FileDescriptor.h"
 #include "util/FileError.h"
@@ -24,64 +24,40 @@ namespace zorva::server {
 
 namespace {
 
+using http::checkGnutls;
+
 constexpr std::time_t kHour = 60 * 60;
 constexpr std::time_t kYear = 365 * 24 * kHour;
-
-struct Free {
-  void operator()(gnutls_x509_crt_int* certificate) const { gnutls_x509_crt_deinit(certificate); }
-  void operator()(gnutls_x509_privkey_int* key) const { gnutls_x509_privkey_deinit(key); }
-};
-using Certificate = std::unique_ptr<gnutls_x509_crt_int, Free>;
-using Key = std::unique_ptr<gnutls_x509_privkey_int, Free>;
-
-void check(int rc) {
-  if (rc < 0) throw std::runtime_error(std::string("a certificate cannot be made: ") + gnutls_strerror(rc));
-}
-
-/// Text that GnuTLS has allocated.
-std::string taken(gnutls_datum_t& datum) {
-  std::string text(reinterpret_cast<const char*>(datum.data), datum.size);
-  gnutls_free(datum.data);
-  return text;
-}
-
-Key newKey() {
-  gnutls_x509_privkey_t key = nullptr;
-  check(gnutls_x509_privkey_init(&key));
-  Key owner(key);
-  check(gnutls_x509_privkey_generate(key, GNUTLS_PK_ECDSA, GNUTLS_CURVE_TO_BITS(GNUTLS_ECC_CURVE_SECP256R1), 0));
-  return owner;
-}
 
 void addName(gnutls_x509_crt_t certificate, const std::string& name) {
   unsigned char bytes[sizeof(in6_addr)];
   for (const int family : {AF_INET, AF_INET6}) {
     if (::inet_pton(family, name.c_str(), bytes) != 1) continue;
     const unsigned int size = family == AF_INET ? sizeof(in_addr) : sizeof(in6_addr);
-    return check(
+    return checkGnutls(
         gnutls_x509_crt_set_subject_alt_name(certificate, GNUTLS_SAN_IPADDRESS, bytes, size, GNUTLS_FSAN_APPEND));
   }
-  check(gnutls_x509_crt_set_subject_alt_name(certificate, GNUTLS_SAN_DNSNAME, name.data(),
-                                             static_cast<unsigned int>(name.size()), GNUTLS_FSAN_APPEND));
+  checkGnutls(gnutls_x509_crt_set_subject_alt_name(certificate, GNUTLS_SAN_DNSNAME, name.data(),
+                                                   static_cast<unsigned int>(name.size()), GNUTLS_FSAN_APPEND));
 }
 
 void setSerial(gnutls_x509_crt_t certificate) {
   unsigned char serial[16];
-  check(gnutls_rnd(GNUTLS_RND_NONCE, serial, sizeof serial));
+  checkGnutls(gnutls_rnd(GNUTLS_RND_NONCE, serial, sizeof serial));
   serial[0] = static_cast<unsigned char>((serial[0] & 0x3F) | 0x40);  // positive, and of full length
-  check(gnutls_x509_crt_set_serial(certificate, serial, sizeof serial));
+  checkGnutls(gnutls_x509_crt_set_serial(certificate, serial, sizeof serial));
 }
 
 /// What the certificate may be used for: to serve TLS, and not to sign others.
 void setPurpose(gnutls_x509_crt_t certificate) {
-  check(gnutls_x509_crt_set_basic_constraints(certificate, 0, -1));
-  check(gnutls_x509_crt_set_key_usage(certificate, GNUTLS_KEY_DIGITAL_SIGNATURE));
-  check(gnutls_x509_crt_set_key_purpose_oid(certificate, GNUTLS_KP_TLS_WWW_SERVER, 0));
+  checkGnutls(gnutls_x509_crt_set_basic_constraints(certificate, 0, -1));
+  checkGnutls(gnutls_x509_crt_set_key_usage(certificate, GNUTLS_KEY_DIGITAL_SIGNATURE));
+  checkGnutls(gnutls_x509_crt_set_key_purpose_oid(certificate, GNUTLS_KP_TLS_WWW_SERVER, 0));
   unsigned char id[64];
   std::size_t size = sizeof id;
-  check(gnutls_x509_crt_get_key_id(certificate, 0, id, &size));
-  check(gnutls_x509_crt_set_subject_key_id(certificate, id, size));
-  check(gnutls_x509_crt_set_authority_key_id(certificate, id, size));
+  checkGnutls(gnutls_x509_crt_get_key_id(certificate, 0, id, &size));
+  checkGnutls(gnutls_x509_crt_set_subject_key_id(certificate, id, size));
+  checkGnutls(gnutls_x509_crt_set_authority_key_id(certificate, id, size));
 }
 
 /// A file under another name until all of them are written.
@@ -126,28 +102,21 @@ class Draft : util::NotCopied {
 
 SelfSigned makeSelfSigned(const std::vector<std::string>& names, std::time_t now) {
   constexpr std::size_t kLongestSubject = 64;
-  const Key key = newKey();
-  gnutls_x509_crt_t certificate = nullptr;
-  check(gnutls_x509_crt_init(&certificate));
-  const Certificate owner(certificate);
-  check(gnutls_x509_crt_set_version(certificate, 3));
+  const http::X509Key key = http::newKey();
+  const http::X509Certificate owner = http::newCertificate();
+  gnutls_x509_crt_int* certificate = owner.get();
+  checkGnutls(gnutls_x509_crt_set_version(certificate, 3));
   setSerial(certificate);
-  check(gnutls_x509_crt_set_activation_time(certificate, now - kHour));  // clients' clocks may be slow
-  check(gnutls_x509_crt_set_expiration_time(certificate, now + kYear));
-  check(gnutls_x509_crt_set_key(certificate, key.get()));
+  checkGnutls(gnutls_x509_crt_set_activation_time(certificate, now - kHour));  // clients' clocks may be slow
+  checkGnutls(gnutls_x509_crt_set_expiration_time(certificate, now + kYear));
+  checkGnutls(gnutls_x509_crt_set_key(certificate, key.get()));
   const std::string subject = names.front().substr(0, kLongestSubject);
-  check(gnutls_x509_crt_set_dn_by_oid(certificate, GNUTLS_OID_X520_COMMON_NAME, 0, subject.data(),
-                                      static_cast<unsigned int>(subject.size())));
+  checkGnutls(gnutls_x509_crt_set_dn_by_oid(certificate, GNUTLS_OID_X520_COMMON_NAME, 0, subject.data(),
+                                            static_cast<unsigned int>(subject.size())));
   for (const std::string& each : names) addName(certificate, each);
   setPurpose(certificate);
-  check(gnutls_x509_crt_sign2(certificate, certificate, key.get(), GNUTLS_DIG_SHA256, 0));
-  gnutls_datum_t certificateText{};
-  gnutls_datum_t keyText{};
-  check(gnutls_x509_crt_export2(certificate, GNUTLS_X509_FMT_PEM, &certificateText));
-  SelfSigned made{taken(certificateText), {}, http::fingerprintOf(certificate)};
-  check(gnutls_x509_privkey_export2_pkcs8(key.get(), GNUTLS_X509_FMT_PEM, nullptr, GNUTLS_PKCS_PLAIN, &keyText));
-  made.key = taken(keyText);
-  return made;
+  checkGnutls(gnutls_x509_crt_sign2(certificate, certificate, key.get(), GNUTLS_DIG_SHA256, 0));
+  return {http::pemOf(owner), http::pemOf(key), http::fingerprintOf(owner)};
 }
 
 void writeNewFiles(const std::vector<NewFile>& files) {

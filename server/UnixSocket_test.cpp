@@ -55,15 +55,8 @@ TEST(UnixSocket, TakesAnyHost) {
 
 TEST(UnixSocket, TheUserOfAChangeIsTheOneOfTheProcess) {
   const TestDaemon daemon(kSocket);
-  const std::string body =
-      "<?xml version=\"1.0\" encoding=\"utf-8\"?><CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.0\">"
-      "<MESSAGE ID=\"1\" PROTOCOLVERSION=\"1.0\"><SIMPLEREQ><IMETHODCALL NAME=\"SetProperty\"><LOCALNAMESPACEPATH>"
-      "<NAMESPACE NAME=\"root\"/><NAMESPACE NAME=\"cimv2\"/></LOCALNAMESPACEPATH><IPARAMVALUE NAME=\"InstanceName\">"
-      "<INSTANCENAME CLASSNAME=\"ZORVA_DNSProtocolEndPoint\"><KEYBINDING NAME=\"Name\"><KEYVALUE>eth0</KEYVALUE>"
-      "</KEYBINDING></INSTANCENAME></IPARAMVALUE><IPARAMVALUE NAME=\"PropertyName\"><VALUE>DomainName</VALUE>"
-      "</IPARAMVALUE><IPARAMVALUE NAME=\"NewValue\"><VALUE>example.net</VALUE></IPARAMVALUE></IMETHODCALL></SIMPLEREQ>"
-      "</MESSAGE></CIM>";
-  const std::string request = daemon.directory().write("request", body);
+  const std::string whole = testing::changeOfDomain();
+  const std::string request = daemon.directory().write("request", whole.substr(whole.find("\r\n\r\n") + 4));
   page(daemon.directory() / "cim.sock",
        "-H 'Content-Type: application/xml' -H 'CIMOperation: MethodCall' -H 'CIMMethod: "
        "SetProperty' -H 'CIMObject: root/cimv2' --data-binary @" +

@@ -11,70 +11,42 @@ namespace zorva::http::testing {
 
 namespace {
 
-void check(int rc) {
-  if (rc < 0) throw std::runtime_error(gnutls_strerror(rc));
-}
-
-std::string taken(gnutls_datum_t& datum) {
-  std::string text(reinterpret_cast<const char*>(datum.data), datum.size);
-  gnutls_free(datum.data);
-  return text;
-}
-
-std::string pemOf(gnutls_x509_crt_t certificate) {
-  gnutls_datum_t text{};
-  check(gnutls_x509_crt_export2(certificate, GNUTLS_X509_FMT_PEM, &text));
-  return taken(text);
+X509Certificate certificateFor(const Wanted& wanted, const X509Key& key, unsigned char serial) {
+  X509Certificate owner = newCertificate();
+  gnutls_x509_crt_int* certificate = owner.get();
+  const std::time_t now = std::time(nullptr);
+  checkGnutls(gnutls_x509_crt_set_version(certificate, 3));
+  checkGnutls(gnutls_x509_crt_set_serial(certificate, &serial, 1));
+  checkGnutls(gnutls_x509_crt_set_activation_time(certificate, now + wanted.from));
+  checkGnutls(gnutls_x509_crt_set_expiration_time(certificate, now + wanted.until));
+  checkGnutls(gnutls_x509_crt_set_dn(certificate, ("CN=" + wanted.subject).c_str(), nullptr));
+  checkGnutls(gnutls_x509_crt_set_key(certificate, key.get()));
+  return owner;
 }
 
 }  // namespace
 
-TestAuthority::Key TestAuthority::newKey() {
-  gnutls_x509_privkey_t key = nullptr;
-  check(gnutls_x509_privkey_init(&key));
-  Key owner(key);
-  check(gnutls_x509_privkey_generate(key, GNUTLS_PK_ECDSA, GNUTLS_CURVE_TO_BITS(GNUTLS_ECC_CURVE_SECP256R1), 0));
-  return owner;
-}
-
-TestAuthority::Certificate TestAuthority::newCertificate(const Wanted& wanted, const Key& key, int serial) {
-  gnutls_x509_crt_t certificate = nullptr;
-  check(gnutls_x509_crt_init(&certificate));
-  Certificate owner(certificate);
-  const auto number = static_cast<unsigned char>(serial);
-  const std::time_t now = std::time(nullptr);
-  check(gnutls_x509_crt_set_version(certificate, 3));
-  check(gnutls_x509_crt_set_serial(certificate, &number, 1));
-  check(gnutls_x509_crt_set_activation_time(certificate, now + wanted.from));
-  check(gnutls_x509_crt_set_expiration_time(certificate, now + wanted.until));
-  check(gnutls_x509_crt_set_dn(certificate, ("CN=" + wanted.subject).c_str(), nullptr));
-  check(gnutls_x509_crt_set_key(certificate, key.get()));
-  return owner;
-}
-
 TestAuthority::TestAuthority(const agent::testing::TemporaryDirectory& directory, const std::string& name)
-    : directory_(directory), key_(newKey()), certificate_(newCertificate({name, {}}, key_, 1)) {
-  check(gnutls_x509_crt_set_basic_constraints(certificate_.get(), 1, -1));
-  check(gnutls_x509_crt_set_key_usage(certificate_.get(), GNUTLS_KEY_KEY_CERT_SIGN));
-  check(gnutls_x509_crt_sign2(certificate_.get(), certificate_.get(), key_.get(), GNUTLS_DIG_SHA256, 0));
-  file_ = directory_.write(name + ".crt", pemOf(certificate_.get()));
+    : directory_(directory), key_(newKey()), certificate_(certificateFor({name, {}}, key_, 1)) {
+  checkGnutls(gnutls_x509_crt_set_basic_constraints(certificate_.get(), 1, -1));
+  checkGnutls(gnutls_x509_crt_set_key_usage(certificate_.get(), GNUTLS_KEY_KEY_CERT_SIGN));
+  checkGnutls(gnutls_x509_crt_sign2(certificate_.get(), certificate_.get(), key_.get(), GNUTLS_DIG_SHA256, 0));
+  file_ = directory_.write(name + ".crt", pemOf(certificate_));
 }
 
 IssuedFiles TestAuthority::issue(const std::string& name, const Wanted& wanted) const {
   constexpr mode_t kForGroup = 0640;
-  const Key key = newKey();
-  const Certificate certificate = newCertificate(wanted, key, 2);
+  const X509Key key = newKey();
+  const X509Certificate certificate = certificateFor(wanted, key, 2);
   for (const std::string& each : wanted.names) {
-    check(gnutls_x509_crt_set_subject_alt_name(certificate.get(), GNUTLS_SAN_DNSNAME, each.data(),
-                                               static_cast<unsigned int>(each.size()), GNUTLS_FSAN_APPEND));
+    checkGnutls(gnutls_x509_crt_set_subject_alt_name(certificate.get(), GNUTLS_SAN_DNSNAME, each.data(),
+                                                     static_cast<unsigned int>(each.size()), GNUTLS_FSAN_APPEND));
   }
   const char* purpose = wanted.forClient ? GNUTLS_KP_TLS_WWW_CLIENT : GNUTLS_KP_TLS_WWW_SERVER;
-  check(gnutls_x509_crt_set_key_purpose_oid(certificate.get(), purpose, 0));
-  check(gnutls_x509_crt_sign2(certificate.get(), certificate_.get(), key_.get(), GNUTLS_DIG_SHA256, 0));
-  gnutls_datum_t keyText{};
-  check(gnutls_x509_privkey_export2(key.get(), GNUTLS_X509_FMT_PEM, &keyText));
-  const IssuedFiles files{directory_.write(name + ".crt", pemOf(certificate.get())),
-                          directory_.write(name + ".key", taken(keyText))};
+  checkGnutls(gnutls_x509_crt_set_key_purpose_oid(certificate.get(), purpose, 0));
+  checkGnutls(gnutls_x509_crt_sign2(certificate.get(), certificate_.get(), key_.get(), GNUTLS_DIG_SHA256, 0));
+  const IssuedFiles files{directory_.write(name + ".crt", pemOf(certificate)),
+                          directory_.write(name + ".key", pemOf(key))};
   ::chmod(files.key.c_str(), kForGroup);
   return files;
 }

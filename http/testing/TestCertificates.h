@@ -2,14 +2,12 @@
 
 // For tests: an authority of the test's own, and the certificates that it issues.
 
-#include <gnutls/x509.h>
-
 #include <ctime>
-#include <memory>
 #include <string>
 #include <vector>
 
 #include "agent/testing/TemporaryDirectory.h"
+#include "http/GnutlsHandles.h"
 
 namespace zorva::http::testing {
 
@@ -38,19 +36,9 @@ class TestAuthority {
   IssuedFiles issue(const std::string& name, const Wanted& wanted = {}) const;
 
  private:
-  struct Free {
-    void operator()(gnutls_x509_crt_int* certificate) const { gnutls_x509_crt_deinit(certificate); }
-    void operator()(gnutls_x509_privkey_int* key) const { gnutls_x509_privkey_deinit(key); }
-  };
-  using Certificate = std::unique_ptr<gnutls_x509_crt_int, Free>;
-  using Key = std::unique_ptr<gnutls_x509_privkey_int, Free>;
-
-  static Key newKey();
-  static Certificate newCertificate(const Wanted& wanted, const Key& key, int serial);
-
   const agent::testing::TemporaryDirectory& directory_;
-  Key key_;
-  Certificate certificate_;
+  X509Key key_;
+  X509Certificate certificate_;
   std::string file_;
 };
 

@@ -11,6 +11,8 @@
 #include <stdexcept>
 #include <thread>
 
+#include "http/testing/TestWire.h"
+
 namespace zorva::server::testing {
 
 namespace {
@@ -142,6 +144,18 @@ DaemonOutcome TestDaemon::run(const std::vector<std::string>& arguments) {
   int status = 0;
   ::waitpid(process, &status, 0);
   return {exitCodeOf(status), contentsOf(directory / "out"), contentsOf(directory / "err")};
+}
+
+std::string changeOfDomain() {
+  return http::testing::posting(
+      "<?xml version=\"1.0\" encoding=\"utf-8\"?><CIM CIMVERSION=\"2.0\" DTDVERSION=\"2.0\">"
+      "<MESSAGE ID=\"1\" PROTOCOLVERSION=\"1.0\"><SIMPLEREQ><IMETHODCALL NAME=\"SetProperty\"><LOCALNAMESPACEPATH>"
+      "<NAMESPACE NAME=\"root\"/><NAMESPACE NAME=\"cimv2\"/></LOCALNAMESPACEPATH><IPARAMVALUE NAME=\"InstanceName\">"
+      "<INSTANCENAME CLASSNAME=\"ZORVA_DNSProtocolEndPoint\"><KEYBINDING NAME=\"Name\"><KEYVALUE>eth0</KEYVALUE>"
+      "</KEYBINDING></INSTANCENAME></IPARAMVALUE><IPARAMVALUE NAME=\"PropertyName\"><VALUE>DomainName</VALUE>"
+      "</IPARAMVALUE><IPARAMVALUE NAME=\"NewValue\"><VALUE>example.net</VALUE></IPARAMVALUE></IMETHODCALL></SIMPLEREQ>"
+      "</MESSAGE></CIM>",
+      "CIMOperation: MethodCall\r\nCIMMethod: SetProperty\r\nCIMObject: root/cimv2\r\n");
 }
 
 }  // namespace zorva::server::testing

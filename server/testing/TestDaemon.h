@@ -60,4 +60,7 @@ class TestDaemon : util::NotCopied {
   int tlsPort_ = 0;
 };
 
+/// A request that sets the domain of eth0.
+std::string changeOfDomain();
+
 }  // namespace zorva::server::testing
