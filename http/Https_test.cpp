@@ -4,8 +4,11 @@
 #include <gtest/gtest.h>
 #include <sys/stat.h>
 
+#include <atomic>
 #include <mutex>
 #include <string>
+#include <thread>
+#include <vector>
 
 #include "http/TlsIdentity.h"
 #include "http/testing/TestCertificates.h"
@@ -183,6 +186,29 @@ TEST_F(Https, NewAuthoritiesCountForNewConnections) {
   EXPECT_THAT(askAs(*server, stranger), HasSubstr(" 403 "));
   server->http().setTls(TlsIdentity::load({server_.certificate, server_.key, foreign_.file()}));
   EXPECT_EQ(askAs(*server, stranger), "text 200 0");
+}
+
+TEST_F(Https, ConnectionsOutliveTheIdentityThatTheyBeganWith) {
+  const auto server = serve(authority_.file());
+  const IssuedFiles client = authority_.issue("client", {"alice", {}, true});
+  std::atomic<int> running = 2;
+  std::string codes[2];
+  std::vector<std::thread> clients;
+  for (int i = 0; i < 2; ++i) {
+    clients.emplace_back([&, i] {
+      codes[i] = outputOf("curl -sS -o /dev/null -w '%{http_code} ' --cacert " + authority_.file() + " --cert " +
+                          client.certificate + " --key " + client.key + (i == 0 ? "" : " -H Connection:close") +
+                          " 'https://localhost:" + std::to_string(server->tlsPort()) + "/{,,,,,,,,,,,,,,,,,,,}'");
+      --running;
+    });
+  }
+  while (running > 0) {
+    server->http().setTls(TlsIdentity::load({server_.certificate, server_.key, authority_.file()}));
+  }
+  for (std::thread& each : clients) each.join();
+  std::string all;
+  for (int i = 0; i < 20; ++i) all += "200 ";
+  for (const std::string& each : codes) EXPECT_EQ(each, all);
 }
 
 // ---- Files ----

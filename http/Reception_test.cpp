@@ -103,7 +103,7 @@ TEST_F(Ports, SilentClientsGiveWayWhereAllConnectionsAreTaken) {
   }
   const auto open = [&] {
     return static_cast<std::size_t>(std::count_if(
-        silent.begin(), silent.end(), [](const auto& each) { return !each->isClosedWithin(milliseconds(1)); }));
+        silent.begin(), silent.end(), [](const auto& each) { return !each->isClosedWithin(milliseconds(5)); }));
   };
   for (int i = 0; i < 100 && open() > kPlaces; ++i) std::this_thread::sleep_for(milliseconds(10));
   EXPECT_EQ(open(), kPlaces);
