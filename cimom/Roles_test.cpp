@@ -119,7 +119,6 @@ TEST_F(Roles, ARefusalSaysWhoMayNotDoWhat) {
               HasSubstr("a client without a login may only read in root/cimv2"));
   EXPECT_THAT(ask(client(access::Grants(Role::None)), "GetInstance", of),
               HasSubstr("alice may not use the namespace root/cimv2"));
-  EXPECT_TRUE(service_.changes().empty());
 }
 
 TEST_F(Roles, ARoleMayDifferInANamespace) {

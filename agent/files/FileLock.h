@@ -7,6 +7,7 @@
 #include <chrono>
 #include <string>
 
+#include "agent/interface/AgentApi.h"
 #include "util/FileDescriptor.h"
 #include "util/NotCopied.h"
 
@@ -14,7 +15,7 @@ namespace zorva::agent {
 
 /// A lock between processes, and between threads, on its own file, which is never removed. Each object has its own open
 /// file. Held until the object is destroyed.
-class FileLock : util::NotCopied {
+class ZORVA_AGENT_API FileLock : util::NotCopied {
  public:
   enum class Mode { Shared, Exclusive };
   using Deadline = std::chrono::steady_clock::time_point;
