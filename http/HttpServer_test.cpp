@@ -643,7 +643,7 @@ TEST_F(HttpServerLogin, OthersAreServedWhileALoginIsChecked) {
 }
 
 TEST_F(HttpServerLogin, TheBodyIsNotReadBeforeTheClientIsKnown) {
-  ASSERT_TRUE(wire_.send("POST /x HTTP/1.1\r\nHost: x\r\nContent-Length: 2\r\nExpect: 100-continue\r\n" +
+  ASSERT_TRUE(wire_.send("POST /x HTTP/1.1\r\nHost: localhost\r\nContent-Length: 2\r\nExpect: 100-continue\r\n" +
                          login("right") + "\r\n"));
   EXPECT_EQ(wire_.take(1, milliseconds(100)), "");
   gate_.open();

@@ -61,7 +61,7 @@ TEST(UnixSocket, TheUserOfAChangeIsTheOneOfTheProcess) {
        "-H 'Content-Type: application/xml' -H 'CIMOperation: MethodCall' -H 'CIMMethod: "
        "SetProperty' -H 'CIMObject: root/cimv2' --data-binary @" +
            request);
-  EXPECT_TRUE(daemon.logs(" (user " + std::to_string(::getuid()) + ") changed ")) << daemon.log();
+  EXPECT_TRUE(daemon.logs(" (user " + std::to_string(::getuid()) + ")\" operation=SetProperty ")) << daemon.log();
 }
 
 TEST(UnixSocket, ReplacesTheOneOfAServerThatWasKilled) {
