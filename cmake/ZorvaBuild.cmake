@@ -109,13 +109,14 @@ function(zorva_build_as_test target)
   endif()
 endfunction()
 
-# zorva_add_test(NAME SOURCES files... LIBS libraries...): one GoogleTest program; each of its tests is a ctest test with
-# the label NAME.
+# zorva_add_test(NAME [ALONE | PARTS n] SOURCES files... LIBS libraries... DEPENDS targets...): one GoogleTest program.
+# ctest runs it as a whole, because the start of a process costs more than most cases do. PARTS: as NAME.1 to NAME.n at the
+# same time, each with every n-th case. ALONE: each case in a process of its own, under its name. The label is NAME.
 function(zorva_add_test name)
   if(NOT ZORVA_BUILD_TESTS)
     return()
   endif()
-  cmake_parse_arguments(ARG "" "" "SOURCES;LIBS;DEPENDS" ${ARGN})
+  cmake_parse_arguments(ARG "ALONE" "PARTS" "SOURCES;LIBS;DEPENDS" ${ARGN})
   add_executable(${name} ${ARG_SOURCES})
   target_link_libraries(${name} PUBLIC ${ARG_LIBS} GTest::gtest_main)
   zorva_build_as_test(${name})
@@ -126,5 +127,16 @@ function(zorva_add_test name)
   if(ARG_DEPENDS)
     add_dependencies(${name} ${ARG_DEPENDS})
   endif()
-  gtest_discover_tests(${name} DISCOVERY_MODE PRE_TEST NO_PRETTY_VALUES PROPERTIES TIMEOUT 300 LABELS ${name})
+  if(ARG_ALONE)
+    gtest_discover_tests(${name} DISCOVERY_MODE PRE_TEST NO_PRETTY_VALUES PROPERTIES TIMEOUT 300 LABELS ${name})
+    return()
+  elseif(NOT ARG_PARTS)
+    set(ARG_PARTS 1)
+  endif()
+  foreach(part RANGE 1 ${ARG_PARTS})
+    math(EXPR index "${part} - 1")
+    add_test(NAME ${name}.${part} COMMAND ${name})
+    set_tests_properties(${name}.${part} PROPERTIES TIMEOUT 600 LABELS ${name}
+      ENVIRONMENT "GTEST_TOTAL_SHARDS=${ARG_PARTS};GTEST_SHARD_INDEX=${index}")
+  endforeach()
 endfunction()

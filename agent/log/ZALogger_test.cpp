@@ -26,6 +26,7 @@ class ZALoggerTest : public ::testing::Test {
   ZALoggerTest() {
     config_.logTarget = directory_ / "log";
     config_.traceTarget = directory_ / "trace";
+    zorva::agent::reset();  // another test's lines may have gone elsewhere already
     zorva::agent::setConfig(config_);
   }
   ~ZALoggerTest() override { zorva::agent::reset(); }
