@@ -283,13 +283,19 @@ TEST(RemoteFailure, ReportsThatNoServerListens) {
 TEST(RemoteFailure, ReportsAWrongUrl) {
   const Outcome outcome = TestHost().run({"show", "--url", "localhost:5988"});
   EXPECT_EQ(outcome.exitCode, 2);
-  EXPECT_THAT(outcome.err, HasSubstr("--url: it begins neither with http:// nor with https://"));
+  EXPECT_THAT(outcome.err, HasSubstr("--url: it begins neither with https:// nor with http:// nor with unix:"));
 }
 
 TEST(RemoteFailure, ReportsHttpErrors) {
   Outcome outcome = against(ScriptedServer::reply("", "401 Unauthorized"));
   EXPECT_EQ(outcome.exitCode, 1);
-  EXPECT_THAT(outcome.err, HasSubstr("answered HTTP 401: it requires another login"));
+  EXPECT_THAT(outcome.err, AllOf(HasSubstr(" asks for a login\n"), HasSubstr("--url https://USER@HOST:5989")));
+  outcome = against(ScriptedServer::reply("a login needs https\nmore", "401 Unauthorized",
+                                          "Content-Type: text/plain; charset=utf-8\r\n"));
+  EXPECT_THAT(outcome.err, HasSubstr(" asks for a login: a login needs https\n"));
+  outcome = against(ScriptedServer::reply("no page\x1B may ask", "403 Forbidden", "Content-Type: text/plain\r\n"));
+  EXPECT_EQ(outcome.exitCode, 1);
+  EXPECT_THAT(outcome.err, HasSubstr(" refuses this client: no page\\x1B may ask\n"));
   outcome = against(ScriptedServer::reply("", "400 Bad Request", "CIMError: request-not-well-formed%20\x1B[2J\r\n"));
   EXPECT_EQ(outcome.exitCode, 1);
   EXPECT_THAT(outcome.err, HasSubstr("answered HTTP 400: request-not-well-formed \\x1B[2J\n"));

@@ -25,7 +25,6 @@ using zorva::agent::PropertyChange;
 struct ApplyCommandOptions {
   std::vector<std::string> interfaces;
   bool all = false;
-  bool dryRun = false;
   bool automatic = false;
   std::string confirm;  ///< seconds; empty: no trial
 };
@@ -125,20 +124,21 @@ auto whileSettingsStay(Session& session, Work work) {
   });
 }
 
-std::vector<ApplyResult> applyOnce(Session& session, const ApplyCommandOptions& options,
+std::vector<ApplyResult> applyOnce(Session& session, const Globals& globals, const ApplyCommandOptions& options,
                                    std::optional<std::chrono::seconds> trial = std::nullopt) {
   return whileSettingsStay(session, [&] {
-    return zorva::agent::applySettings(options.interfaces, {options.dryRun, options.automatic, trial});
+    return zorva::agent::applySettings(options.interfaces, {globals.dryRun, options.automatic, trial});
   });
 }
 
 /// The service is not started again by what changes while it runs.
-std::vector<ApplyResult> applyUntilNothingChanges(Session& session, const ApplyCommandOptions& options) {
+std::vector<ApplyResult> applyUntilNothingChanges(Session& session, const Globals& globals,
+                                                  const ApplyCommandOptions& options) {
   constexpr int kMostTurns = 10;
-  std::vector<ApplyResult> all = applyOnce(session, options);
+  std::vector<ApplyResult> all = applyOnce(session, globals, options);
   std::vector<ApplyResult> results = all;
   for (int turn = 1; turn < kMostTurns && changedAny(results); ++turn) {
-    results = applyOnce(session, options);
+    results = applyOnce(session, globals, options);
     if (changedAny(results)) all.insert(all.end(), results.begin(), results.end());
   }
   return all;
@@ -173,7 +173,7 @@ void awaitVerdict(Session& session, const ApplyCommandOptions& options, std::chr
 void applyOnTrial(Session& session, const Globals& globals, const ApplyCommandOptions& options) {
   const std::chrono::seconds longest = secondsOf(options.confirm);
   const TrialGuard guard(globals);
-  const std::vector<ApplyResult> results = applyOnce(session, options, longest);
+  const std::vector<ApplyResult> results = applyOnce(session, globals, options, longest);
   writeResults(session, globals, results, kApplyWords, false);
   if (changedAny(results)) awaitVerdict(session, options, longest);
   requireNoProblem(results, kApplyWords, false);
@@ -183,21 +183,21 @@ void apply(const Globals& globals, const ApplyCommandOptions& options) {
   requireSelection(options, kApplyWords, false);
   Session session(globals);
   if (options.automatic && !zorva::agent::currentConfig().appliesToHost) return;
-  if (!options.confirm.empty() && !options.dryRun) return applyOnTrial(session, globals, options);
+  if (!options.confirm.empty() && !globals.dryRun) return applyOnTrial(session, globals, options);
   const std::vector<ApplyResult> results =
-      options.automatic ? applyUntilNothingChanges(session, options) : applyOnce(session, options);
-  writeResults(session, globals, results, kApplyWords, options.dryRun);
-  requireNoProblem(results, kApplyWords, options.dryRun);
+      options.automatic ? applyUntilNothingChanges(session, globals, options) : applyOnce(session, globals, options);
+  writeResults(session, globals, results, kApplyWords, globals.dryRun);
+  requireNoProblem(results, kApplyWords, globals.dryRun);
 }
 
 void revert(const Globals& globals, const ApplyCommandOptions& options) {
   requireSelection(options, kRevertWords, true);
   Session session(globals);
   const std::vector<ApplyResult> results = whileSettingsStay(session, [&] {
-    return zorva::agent::revertSettings(options.interfaces, {options.dryRun, false, std::nullopt});
+    return zorva::agent::revertSettings(options.interfaces, {globals.dryRun, false, std::nullopt});
   });
-  writeResults(session, globals, results, kRevertWords, options.dryRun);
-  requireNoProblem(results, kRevertWords, options.dryRun);
+  writeResults(session, globals, results, kRevertWords, globals.dryRun);
+  requireNoProblem(results, kRevertWords, globals.dryRun);
 }
 
 void confirm(const Globals& globals) {
@@ -224,7 +224,7 @@ void addApplyCommands(CommandLine& line) {
           "  zorvactl apply eth0\n"
           "  zorvactl apply --confirm 60                   taken back unless confirmed in a minute")
       .flag("--all", "Of all interfaces that have any, as without a name", options->all)
-      .dryRun(options->dryRun)
+      .dryRun()
       .flag("--automatic",
             "As the service does: nothing unless the configuration says apply = \"host\", and not what was "
             "taken back",
@@ -243,7 +243,7 @@ void addApplyCommands(CommandLine& line) {
       .local()
       .examples("  zorvactl revert eth0\n  zorvactl revert --all --dry-run")
       .flag("--all", "Of all interfaces that were ever changed", reverting->all)
-      .dryRun(reverting->dryRun)
+      .dryRun()
       .words("INTERFACE", "Of these interfaces", Many::Any, reverting->interfaces)
       .runs<ApplyCommandOptions>(revert, reverting);
   line.add("guard-trial", "Take the settings on trial back when standard input ends").hidden().runs(guardTrial);

@@ -160,6 +160,7 @@ Subcommand addOne(CommandLine& line, const Naming& naming, Results results,
   Subcommand subcommand = line.add(naming.name, naming.description);
   subcommand.alias(naming.alias)
       .readsNames()
+      .gathers()
       .word("PATH", "The object path at the near end", options->path)
       .option("--role", "ROLE", "Only where the near end is this reference", options->role);
   addFilter(subcommand, *options);

@@ -3,6 +3,7 @@
 #include <algorithm>
 
 #include "cli/commands/Commands.h"
+#include "cli/output/Capture.h"
 #include "cli/output/Console.h"
 #include "cli/output/Failure.h"
 #include "cli/output/JsonOutput.h"
@@ -21,7 +22,7 @@ namespace {
 struct ModifyOptions {
   std::string path;
   std::vector<std::string> values;  ///< "NAME=VALUE"
-  ChangeOptions change;
+  bool only = false;                ///< send the changed properties alone
 };
 
 struct InvokeOptions {
@@ -79,11 +80,34 @@ std::string parametersOf(const schema::ClassMethod& method) {
   return method.name + " takes " + (parameters.empty() ? "no parameters" : joined(parameters, ", "));
 }
 
-std::string methodTable(const broker::MethodResult& result, const Layout& layout) {
-  Table table;
-  table.add({"ReturnValue", valueText(result.returnValue, nullptr)});
-  for (const broker::NamedValue& output : result.output) table.add({output.name, valueText(output.value, nullptr)});
-  return table.text(layout);
+/// Values with their names; the object before them where there are several hosts.
+Table valueTable(const broker::ObjectPath& path, const std::vector<broker::NamedValue>& values, const Layout& layout) {
+  Table table(layout.rowsAlone ? std::vector<std::string>{"OBJECT", "NAME", "VALUE"} : std::vector<std::string>());
+  for (const broker::NamedValue& each : values) {
+    std::vector<Cell> row{each.name, valueText(each.value, nullptr)};
+    if (layout.rowsAlone) row.insert(row.begin(), shortPathText(path));
+    table.add(std::move(row));
+  }
+  return table;
+}
+
+Table resultTable(const broker::ObjectPath& path, const broker::MethodResult& result, const Layout& layout) {
+  std::vector<broker::NamedValue> values{{"ReturnValue", result.returnValue}};
+  values.insert(values.end(), result.output.begin(), result.output.end());
+  return valueTable(path, values, layout);
+}
+
+/// What would be called.
+void writeCall(const Globals& globals, const Session& session, const broker::ObjectPath& path,
+               const schema::ClassMethod& method, const std::vector<broker::NamedValue>& input) {
+  if (globals.output == OutputFormat::Json) {
+    write(methodCallJson(path, method.name, input) + "\n");
+    return;
+  }
+  std::vector<broker::NamedValue> values{{"method", broker::Value::text(method.name)}};
+  values.insert(values.end(), input.begin(), input.end());
+  if (!session.layout().rowsAlone) write("would call " + method.name + " of " + printable(shortPathText(path)) + "\n");
+  writeTable(valueTable(path, values, session.layout()), session.layout());
 }
 
 void modifyInstance(const Globals& globals, const ModifyOptions& options) {
@@ -95,7 +119,7 @@ void modifyInstance(const Globals& globals, const ModifyOptions& options) {
   changes.reserve(assignments.size());
   for (const Assignment& assignment : assignments) changes.push_back(parseChange(declared, assignment));
 
-  const ChangeOptions& change = options.change;
+  const ChangeOptions change{options.only, globals.dryRun};
   const Session::Changing alone(session, change.dryRun);
   const broker::Instance instance = changeInstance(session, path, changes, change);
   if (globals.output == OutputFormat::Json) {
@@ -114,12 +138,16 @@ void invokeMethod(const Globals& globals, const InvokeOptions& options) {
   input.reserve(assignments.size());
   for (const Assignment& assignment : assignments) input.push_back(parseParameter(method, assignment));
 
+  if (globals.dryRun) return writeCall(globals, session, path, method, input);
   const auto result = session.cim().invokeMethod(path, method.name, input);
   if (!result) {
     throw operationFailure(method.name + " of " + shortPathText(path), result.error(), parametersOf(method));
   }
-  write(globals.output == OutputFormat::Json ? methodResultJson(*result) + "\n"
-                                             : methodTable(*result, session.layout()));
+  if (globals.output == OutputFormat::Json) {
+    write(methodResultJson(*result) + "\n");
+  } else {
+    writeTable(resultTable(path, *result, session.layout()), session.layout());
+  }
   if (const std::string value = valueText(result->returnValue, nullptr); value != "0" && !result->returnValue.isNull) {
     throw Failure(ExitCode::Failed, method.name + " returned " + value);
   }
@@ -137,6 +165,8 @@ void addModifyCommand(CommandLine& line) {
   line.add("modify", "Change properties of an instance")
       .alias("mi")
       .writesJson()
+      .changes()
+      .gathers()
       .examples(
           "  zorvactl modify 'ZORVA_DNSSettingData.InstanceID=\"Computer%eth0\"' DomainName=lab.example.org\n"
           "  zorvactl modify 'ZORVA_DNSSettingData.InstanceID=\"Computer%eth0\"' \\\n"
@@ -145,8 +175,8 @@ void addModifyCommand(CommandLine& line) {
       .word("PATH", "Its object path", options->path)
       .words("NAME=VALUE", "A property; repeat its name for an array, NAME= empties it, NAME=null is CIM's NULL",
              Many::Some, options->values, "PROPERTY=")
-      .flag("--only", "Send these properties alone, and not the others as they were read", options->change.only)
-      .flag("--dry-run", "Show what would be sent, and send nothing", options->change.dryRun)
+      .flag("--only", "Send these properties alone, and not the others as they were read", options->only)
+      .dryRun("Show what would be sent, and send nothing")
       .runs<ModifyOptions>(modifyInstance, options);
 }
 
@@ -155,10 +185,13 @@ void addInvokeCommand(CommandLine& line) {
   line.add("invoke", "Call a method of an instance")
       .alias("cm")
       .writesJson()
+      .changes()
+      .gathers()
       .examples("  zorvactl invoke 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' SetDNSDomain DNSDomain=x.example.org")
       .word("PATH", "Its object path", options->path)
       .word("METHOD", "The method", options->method)
       .words("NAME=VALUE", "A parameter; repeat its name for an array", Many::Any, options->values, "PARAMETER=")
+      .dryRun("Show what would be called, and call nothing")
       .runs<InvokeOptions>(invokeMethod, options);
 }
 

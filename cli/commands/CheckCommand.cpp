@@ -74,7 +74,7 @@ CheckResult resultOf(Session& session, const CheckOptions& options) {
 }
 
 void checkHost(const Globals& globals, const CheckOptions& options) {
-  if (!globals.url.empty()) {
+  if (globals.server) {
     throw Failure(ExitCode::WrongUsage,
                   "zorvactl check asks the DNS servers from this host, and not from that of a URL",
                   "leave out --url, and run it on the host that is meant");

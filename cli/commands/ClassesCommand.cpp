@@ -2,6 +2,7 @@
 
 #include "cli/commands/Commands.h"
 #include "cli/commands/ViewJson.h"
+#include "cli/output/Capture.h"
 #include "cli/output/Console.h"
 #include "cli/session/ClassRows.h"
 #include "cli/session/Session.h"
@@ -45,7 +46,7 @@ void listClasses(const Globals& globals, const CountOptions& options) {
     write(classRowsJson(rows) + "\n");
     return;
   }
-  write(classTable(rows).text(session.layout()));
+  writeTable(classTable(rows), session.layout());
   for (const Problem& problem : problemsOf(rows)) tellWarning(problemText(problem));
 }
 
@@ -55,6 +56,7 @@ void addClassesCommand(CommandLine& line) {
   const auto options = std::make_shared<CountOptions>();
   line.add("classes", "The classes with their providers and instance counts")
       .writesJson()
+      .gathers()
       .examples("  zorvactl classes")
       .flag("--all", "Count the associations of a host with very many interfaces, too; takes long", options->all)
       .runs<CountOptions>(listClasses, options);

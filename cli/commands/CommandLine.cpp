@@ -25,7 +25,8 @@ Examples:
   zorvactl ai 'ZORVA_DNSProtocolEndPoint.Name="eth0"' --result-class CIM_RemoteServiceAccessPoint
   zorvactl ifcfg init eth0                               give eth0 a file of settings
   zorvactl dns set eth0 192.0.2.53 2001:db8::53          and change them
-  zorvactl --url http://localhost:5988/root/cimv2 show   what a CIM server says
+  zorvactl --url https://admin@host1 show                what the server of another host says
+  zorvactl --hosts hosts.txt --user admin show           what those of many hosts say
 
 A path may leave out keys where the rest is clear, and take any spelling of names. Exit status: 0 done, 1 the operation
 failed, 2 wrong usage or configuration. "zorvactl SUBCOMMAND --help" tells more.)";
@@ -41,6 +42,7 @@ struct CommandLine::Registered {
   std::map<const CLI::App*, std::vector<OutputFormat>> formats;
   std::set<const CLI::App*> formatsToRequire;
   std::set<const CLI::App*> local;
+  std::map<const CLI::App*, CommandNature> natures;
   std::map<const CLI::Option*, std::string> kinds;  ///< if the name of the option does not say it
   std::map<const CLI::Option*, std::vector<std::string>> choices;
 
@@ -107,6 +109,53 @@ int levelOf(const std::string& word) {
   throw CLI::ValidationError("--log-level", "'" + printable(word) + "' is no level: a number from 0 on is wanted");
 }
 
+std::chrono::milliseconds durationOf(const std::string& word) {
+  double seconds = 0;
+  const auto [end, error] = std::from_chars(word.data(), word.data() + word.size(), seconds);
+  const bool isNumber = error == std::errc() && end == word.data() + word.size();
+  if (isNumber && seconds >= 0.001 && seconds <= 3600) {
+    return std::chrono::milliseconds(static_cast<std::int64_t>(seconds * 1000));
+  }
+  throw CLI::ValidationError("--timeout",
+                             "'" + printable(word) + "' is no time: a number of seconds up to 3600 is wanted");
+}
+
+/// The servers to ask; an option of what they replace excludes them.
+void addServerOptions(CLI::App& app, ServerOptions& servers, const std::vector<CLI::Option*>& replaced) {
+  CLI::Option* url = addTexts(app, "--url",
+                              "Ask this CIM server, and not the providers: https://USER@HOST:PORT/NAMESPACE, "
+                              "http://HOST, or unix: for the socket of this host's; may be repeated",
+                              servers.urls)
+                         ->type_name("URL")
+                         ->allow_extra_args(false);
+  CLI::Option* hosts =
+      addText(app, "--hosts", "Ask the servers of this file: a host name or URL on each line", servers.hostsFile)
+          ->type_name("FILE");
+  for (CLI::Option* each : replaced) {
+    url->excludes(each);
+    hosts->excludes(each);
+  }
+  addText(app, "--user", "Who logs in at servers whose URL names no user", servers.user)->type_name("USER");
+  addText(app, "--password-file",
+          "The file with the password, or '-' for standard input (default: $ZORVACTL_PASSWORD_FILE, else the terminal)",
+          servers.passwordFile)
+      ->type_name("FILE");
+  CLI::Option* authority =
+      addText(app, "--ca", "Trust certificates of these authorities, and not those of the system", servers.caFile)
+          ->type_name("FILE");
+  addText(app, "--fingerprint", "Trust the certificate with this SHA-256, and no other", servers.fingerprint)
+      ->type_name("SHA256")
+      ->excludes(authority);
+  const auto timeout = [&servers](const CLI::results_t& words) {
+    servers.timeout = durationOf(words.back());
+    return true;
+  };
+  app.add_option("--timeout", timeout, "How long a server may take in all; with several: 10, for changes 60")
+      ->type_name("SECONDS");
+  app.add_flag_callback(
+      "--yes", [&servers] { servers.yes = true; }, "Change several hosts without a question");
+}
+
 void addGlobalOptions(CLI::App& app, Globals& globals) {
   const auto output = [&globals](const CLI::results_t& words) {
     globals.output = formatOf(words.back());
@@ -130,10 +179,7 @@ void addGlobalOptions(CLI::App& app, Globals& globals) {
       ->type_name("N");
   CLI::Option* directory =
       addText(app, "--provider-dir", "Where the provider libraries lie", globals.providerDirectory)->type_name("DIR");
-  addText(app, "--url", "Ask this CIM server, and not the providers: http://HOST:PORT/NAMESPACE", globals.url)
-      ->type_name("URL")
-      ->excludes(config)
-      ->excludes(directory);
+  addServerOptions(app, globals.servers, {config, directory});
 }
 
 std::vector<std::string> namesOf(const std::vector<OutputFormat>& formats) {
@@ -198,8 +244,8 @@ std::string CommandLine::Registered::footerOf(const CLI::App& subcommand) const 
   const std::vector<std::string> names = namesOf(formatsOf(subcommand));
   if (names.size() > 1) text += "\nIt writes " + joined(names, ", ") + " (--output).";
   return text +
-         "\nThe options of zorvactl itself may be given here as well: --url, --config, --log-level, --provider-dir, "
-         "--quiet.";
+         "\nThe options of zorvactl itself may be given here as well: --url, --hosts, --config, --log-level, "
+         "--provider-dir, --quiet; zorvactl --help lists them.";
 }
 
 void CommandLine::Registered::requireRunnable() const {
@@ -209,7 +255,7 @@ void CommandLine::Registered::requireRunnable() const {
     throw Failure(ExitCode::WrongUsage, call + " has no output as " + formatName(globals.output),
                   "it writes " + joined(namesOf(allowed), ", "));
   }
-  if (local.contains(chosen) && !globals.url.empty()) {
+  if (local.contains(chosen) && globals.servers.any()) {
     throw Failure(ExitCode::WrongUsage, call + " is about files of this host, which no CIM server hands out",
                   "leave out --url, and run it on the host that is meant");
   }
@@ -281,6 +327,16 @@ Subcommand& Subcommand::local() {
   return *this;
 }
 
+Subcommand& Subcommand::changes() {
+  line_.registered_->natures[&app_].changes = true;
+  return *this;
+}
+
+Subcommand& Subcommand::gathers() {
+  line_.registered_->natures[&app_].gathers = true;
+  return *this;
+}
+
 Subcommand& Subcommand::word(const std::string& name, const std::string& description, std::string& into) {
   addText(app_, name, description, into)->required();
   return *this;
@@ -330,6 +386,10 @@ Subcommand& Subcommand::flag(const std::string& name, const std::string& descrip
   return *this;
 }
 
+Subcommand& Subcommand::dryRun(const char* description) {
+  return flag("--dry-run", description, line_.registered_->globals.dryRun);
+}
+
 Subcommand& Subcommand::runs(Command command) {
   app_.callback([&read = *line_.registered_, &app = app_, command = std::move(command)] {
     read.chosen = &app;
@@ -358,7 +418,8 @@ const Globals& CommandLine::globals() const noexcept { return registered_->globa
 void CommandLine::run() const {
   if (registered_->globals.quiet) writeOnlyErrors();
   registered_->requireRunnable();
-  registered_->command(registered_->globals);
+  runOnHosts(registered_->globals, "zorvactl " + callOf(*registered_->chosen),
+             registered_->natures[registered_->chosen], registered_->command);
 }
 
 std::optional<Telling> CommandLine::read(int argc, const char* const* argv) {

@@ -11,6 +11,7 @@
 #include <utility>
 #include <vector>
 
+#include "cli/commands/HostsRun.h"
 #include "cli/session/Globals.h"
 #include "util/NotCopied.h"
 
@@ -20,9 +21,6 @@ class Option;
 }  // namespace CLI
 
 namespace zorva::cli {
-
-/// Executes a subcommand and writes to standard output. Throws Failure if it fails.
-using Command = std::function<void(const Globals& globals)>;
 
 /// The text to print instead of running a command: help, the version, or the error of the command line.
 struct Telling {
@@ -73,6 +71,13 @@ class Subcommand {
   /// It reads or writes files of this host: the command does not run with a server.
   Subcommand& local();
 
+  /// It may change something on the host that is asked.
+  Subcommand& changes();
+
+  /// Its results on several hosts can be put together: it writes only results, as one JSON document and, where
+  /// Layout::rowsAlone is set, as tables with headings.
+  Subcommand& gathers();
+
   /// A required positional word: "PATH". Its name says how it is completed.
   Subcommand& word(const std::string& name, const std::string& description, std::string& into);
   Subcommand& interface(std::string& into) { return word("INTERFACE", "The interface's name", into); }
@@ -94,7 +99,8 @@ class Subcommand {
                          std::vector<std::string>& into);
 
   Subcommand& flag(const std::string& name, const std::string& description, bool& into);
-  Subcommand& dryRun(bool& into) { return flag("--dry-run", "Show what would be done, and do nothing", into); }
+  /// --dry-run, which sets Globals::dryRun.
+  Subcommand& dryRun(const char* description = "Show what would be done, and do nothing");
 
   /// The command of this subcommand.
   Subcommand& runs(Command command);

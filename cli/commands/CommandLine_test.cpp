@@ -187,8 +187,20 @@ TEST(CommandLine, RequiresALevelThatIsANumber) {
   }
 }
 
+TEST(CommandLine, RequiresATimeThatIsANumberOfSeconds) {
+  for (const char* word : {"x", "0", "-1", "1s", "", "3601", "nan", "inf"}) {
+    EXPECT_THAT(tellingOf({"show", "--timeout", word}).text, HasSubstr("is no time")) << word;
+  }
+  EXPECT_EQ(globalsOf({"show", "--timeout", "0.5"}).servers.timeout, std::chrono::milliseconds(500));
+}
+
 TEST(CommandLine, TakesAServerOrWhatConcernsThisHost) {
-  EXPECT_EQ(globalsOf({"show", "--url", "http://h"}).url, "http://h");
+  using Urls = std::vector<std::string>;
+  EXPECT_EQ(globalsOf({"show", "--url", "http://h"}).servers.urls, Urls{"http://h"});
+  EXPECT_EQ(globalsOf({"--url", "http://a", "show", "--url=http://b", "eth0"}).servers.urls,
+            (Urls{"http://a", "http://b"}));
+  EXPECT_TRUE(tellingOf({"show", "--hosts", "f", "--config", "f"}).isError);
+  EXPECT_TRUE(tellingOf({"show", "--url", "https://h", "--ca", "f", "--fingerprint", "f"}).isError);
   EXPECT_TRUE(tellingOf({"show", "--url", "http://h", "--provider-dir", "d"}).isError);
   EXPECT_TRUE(tellingOf({"show", "--url", "http://h", "--config", "f"}).isError);
 }

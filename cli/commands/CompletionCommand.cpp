@@ -106,7 +106,7 @@ Completion completionOf(const CommandLine& line, const Globals& globals, const s
   if (completion.kind == "INTERFACE") {
     // Those of another host are not known here.
     const bool isHere = std::none_of(before.begin(), before.end(), [](const std::string& word) {
-      return word == "--url" || word.starts_with("--url=");
+      return word == "--url" || word.starts_with("--url=") || word == "--hosts" || word.starts_with("--hosts=");
     });
     if (isHere) addInterfaces(globals, completion.words);
   } else if (completion.kind == "OLD") {

@@ -35,9 +35,9 @@ void setDomain(const Globals& globals, const SettingOptions& options) {
   requirePlainText("NAME", name);
   if (!isName(name)) throw refused(name, std::string("is no domain name: it has ") + kNameRule);
   Session session(globals);
-  const Session::Changing alone(session, options.dryRun);
+  const Session::Changing alone(session, globals.dryRun);
   const broker::Instance setting = settingOfInterface(session, options.interface);
-  changeSetting(session, globals, options, setting, "DomainName", broker::Value::text(name));
+  changeSetting(session, globals, setting, "DomainName", broker::Value::text(name));
 }
 
 }  // namespace
@@ -46,9 +46,11 @@ void addDomainCommand(CommandLine& line) {
   const auto options = std::make_shared<SettingOptions>();
   line.add("domain", "Set the DNS domain of an interface")
       .writesJson()
+      .changes()
+      .gathers()
       .examples("  zorvactl domain eth0 lab.example.org\n  zorvactl domain eth0 ''")
       .interface(options->interface)
-      .dryRun(options->dryRun)
+      .dryRun()
       .words("NAME", "The domain's name; '' empties it", Many::One, options->values)
       .runs<SettingOptions>(setDomain, options);
 }

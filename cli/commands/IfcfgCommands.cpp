@@ -28,7 +28,6 @@ namespace {
 struct InitOptions {
   std::string interface;
   bool force = false;
-  bool dryRun = false;
 };
 
 std::string settingTable(const std::vector<SettingLine>& lines, const Layout& layout) {
@@ -61,7 +60,7 @@ void initInterfaceFile(const Globals& globals, const InitOptions& options) {
   const auto tree = session.tree();
   const SettingFile file(options.interface);
   const std::vector<SettingLine> lines = settingsOfHost(interfaceNode(*tree, options.interface));
-  if (!options.dryRun) {
+  if (!globals.dryRun) {
     makeDefaultDirectory();
     const Session::Changing alone(session);
     file.write(lines, options.force);
@@ -70,7 +69,7 @@ void initInterfaceFile(const Globals& globals, const InitOptions& options) {
     write(settingFileJson(file.path(), lines) + "\n");
     return;
   }
-  write((options.dryRun ? "would write " : "") + printable(file.path()) + "\n" + settingTable(lines, session.layout()));
+  write((globals.dryRun ? "would write " : "") + printable(file.path()) + "\n" + settingTable(lines, session.layout()));
 }
 
 void showInterfaceFile(const Globals& globals, const std::string& interface) {
@@ -137,14 +136,13 @@ void listInterfaceFiles(const Globals& globals) {
 
 struct RemoveOptions {
   std::string interface;
-  bool dryRun = false;
 };
 
 void removeInterfaceFile(const Globals& globals, const RemoveOptions& options) {
   Session session(globals);
   const SettingFile file(options.interface);
   const std::vector<SettingLine> lines = file.read();
-  if (!options.dryRun) {
+  if (!globals.dryRun) {
     const Session::Changing alone(session);
     file.remove();
     if (zorva::agent::currentConfig().appliesToHost) {
@@ -156,14 +154,13 @@ void removeInterfaceFile(const Globals& globals, const RemoveOptions& options) {
     write(settingFileJson(file.path(), lines) + "\n");
     return;
   }
-  write((options.dryRun ? "would remove " : "removed ") + printable(file.path()) + "\n" +
+  write((globals.dryRun ? "would remove " : "removed ") + printable(file.path()) + "\n" +
         settingTable(lines, session.layout()));
 }
 
 struct AdoptOptions {
   std::string from;
   std::string to;
-  bool dryRun = false;
 };
 
 /// The file of an interface that is there is in use; taking it away would change that interface's settings.
@@ -177,7 +174,7 @@ void requireOrphan(const zorva::agent::TreeSnapshot& tree, const std::string& in
 
 void adoptInterfaceFile(const Globals& globals, const AdoptOptions& options) {
   Session session(globals);
-  const Session::Changing alone(session, options.dryRun);
+  const Session::Changing alone(session, globals.dryRun);
   const auto tree = session.tree();
   const SettingFile from(options.from);
   const SettingFile to(options.to);
@@ -188,7 +185,7 @@ void adoptInterfaceFile(const Globals& globals, const AdoptOptions& options) {
     throw Failure(ExitCode::Failed, printable(to.path()) + ": exists already, and is left as it is",
                   "zorvactl ifcfg remove " + printable(options.to) + " removes it");
   }
-  if (!options.dryRun) {
+  if (!globals.dryRun) {
     from.moveTo(to);
     broker::ObjectPath changed;
     changed.className = kSettingClass;
@@ -199,7 +196,7 @@ void adoptInterfaceFile(const Globals& globals, const AdoptOptions& options) {
     write(settingFileJson(to.path(), lines) + "\n");
     return;
   }
-  write((options.dryRun ? "would make " : "made ") + printable(from.path()) + " " + printable(to.path()) + "\n" +
+  write((globals.dryRun ? "would make " : "made ") + printable(from.path()) + " " + printable(to.path()) + "\n" +
         settingTable(lines, session.layout()));
 }
 
@@ -217,7 +214,7 @@ void addFileCommands(Subcommand& ifcfg) {
       .local()
       .examples("  zorvactl ifcfg remove eth0 --dry-run\n  zorvactl ifcfg remove eth0")
       .interface(removed->interface)
-      .dryRun(removed->dryRun)
+      .dryRun()
       .runs<RemoveOptions>(removeInterfaceFile, removed);
 
   const auto adopted = std::make_shared<AdoptOptions>();
@@ -227,7 +224,7 @@ void addFileCommands(Subcommand& ifcfg) {
       .examples("  zorvactl ifcfg adopt eth0 enp1s0             eth0 is called enp1s0 now")
       .word("OLD", "The name of the interface that is gone", adopted->from)
       .word("INTERFACE", "The interface that gets its file", adopted->to)
-      .dryRun(adopted->dryRun)
+      .dryRun()
       .runs<AdoptOptions>(adoptInterfaceFile, adopted);
 }
 
@@ -245,7 +242,7 @@ void addIfcfgCommands(CommandLine& line) {
           "  zorvactl ifcfg init eth0 --dry-run            what it would write\n"
           "  zorvactl ifcfg init eth0 --force              puts a new file in the old one's place")
       .interface(options->interface)
-      .dryRun(options->dryRun)
+      .dryRun()
       .flag("--force", "Replace a file that is there", options->force)
       .runs<InitOptions>(initInterfaceFile, options);
 

@@ -66,7 +66,7 @@ Subcommand addRead(Subcommand subcommand, Results results, const char* word, con
   } else {
     subcommand.readsNames();
   }
-  subcommand.word(word, meaning, options->target).runs<ReadOptions>(command, options);
+  subcommand.gathers().word(word, meaning, options->target).runs<ReadOptions>(command, options);
   return subcommand;
 }
 

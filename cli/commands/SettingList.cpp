@@ -2,6 +2,7 @@
 
 #include <algorithm>
 
+#include "cli/output/Capture.h"
 #include "cli/output/Console.h"
 #include "cli/output/JsonOutput.h"
 #include "cli/output/Text.h"
@@ -79,10 +80,10 @@ std::string placeOf(const Session& session, const ListSetting& setting) {
 template <typename Changed>
 void changeList(const ListSetting& setting, const Globals& globals, const SettingOptions& options, Changed changed) {
   Session session(globals);
-  const Session::Changing alone(session, options.dryRun);
+  const Session::Changing alone(session, globals.dryRun);
   warnOfOrphans(session);
   const broker::Instance instance = settingOf(session, setting, options);
-  changeSetting(session, globals, options, instance, setting.property,
+  changeSetting(session, globals, instance, setting.property,
                 broker::Value::textArray(changed(listOf(instance, setting.property))));
   const std::string place = globals.output == OutputFormat::Json ? std::string() : placeOf(session, setting);
   if (!place.empty()) write("The suffixes are " + printable(place) + ".\n");
@@ -96,6 +97,10 @@ void showList(const ListSetting& setting, const Globals& globals, const SettingO
   const std::vector<std::string> texts = listOf(settingOf(session, setting, options), setting.property);
   if (globals.output == OutputFormat::Json) {
     write(textsJson(texts) + "\n");
+  } else if (session.layout().rowsAlone) {
+    Table table({setting.word});
+    for (const std::string& text : texts) table.add({text});
+    writeTable(table, session.layout());
   } else {
     for (const std::string& text : texts) write(printable(text) + "\n");
   }
@@ -124,7 +129,7 @@ void removeFromList(const ListSetting& setting, const Globals& globals, const Se
 Subcommand addShow(Subcommand& parent, const ListSetting& setting) {
   const auto options = std::make_shared<SettingOptions>();
   Subcommand subcommand = parent.add("show", "Show them");
-  subcommand.writesJson();
+  subcommand.writesJson().gathers();
   if (setting.isOfInterface) subcommand.interface(options->interface);
   subcommand.runs([&setting, options](const Globals& globals) { showList(setting, globals, *options); });
   return subcommand;
@@ -134,9 +139,9 @@ Subcommand addChange(Subcommand& parent, const ListSetting& setting, const char*
                      Many many, ListCommand command) {
   const auto options = std::make_shared<SettingOptions>();
   Subcommand subcommand = parent.add(name, description);
-  subcommand.writesJson();
+  subcommand.writesJson().changes().gathers();
   if (setting.isOfInterface) subcommand.interface(options->interface);
-  subcommand.dryRun(options->dryRun)
+  subcommand.dryRun()
       .words(setting.word, setting.meaning, many, options->values)
       .runs([&setting, command, options](const Globals& globals) { command(setting, globals, *options); });
   return subcommand;
@@ -158,11 +163,11 @@ broker::Instance settingOfInterface(Session& session, const std::string& interfa
                 names.empty() ? "this host has no interfaces" : "there are those of " + joined(names, ", "));
 }
 
-void changeSetting(Session& session, const Globals& globals, const SettingOptions& options,
-                   const broker::Instance& instance, const char* property, broker::Value value) {
+void changeSetting(Session& session, const Globals& globals, const broker::Instance& instance, const char* property,
+                   broker::Value value) {
   const schema::Class& declared = session.classNamed(instance.path.className);
   const std::vector<broker::Property> changes{{property, std::move(value), declared.findProperty(property)}};
-  const ChangeOptions change{false, options.dryRun};
+  const ChangeOptions change{false, globals.dryRun};
   const broker::Instance now = changeInstance(session, instance.path, changes, change);
   if (globals.output == OutputFormat::Json) {
     write(instanceJson(now, 0) + "\n");

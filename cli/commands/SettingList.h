@@ -18,7 +18,6 @@ namespace zorva::cli {
 struct SettingOptions {
   std::string interface;            ///< not for the settings of the host
   std::vector<std::string> values;  ///< servers, suffixes, the name of a domain
-  bool dryRun = false;
 };
 
 /// A property that is a list, and how a person names and changes it.
@@ -55,8 +54,8 @@ Subcommand addChange(Subcommand& parent, const ListSetting& setting, const char*
 broker::Instance settingOfInterface(Session& session, const std::string& interface);
 
 /// Changes one property and shows what came of it.
-void changeSetting(Session& session, const Globals& globals, const SettingOptions& options,
-                   const broker::Instance& instance, const char* property, broker::Value value);
+void changeSetting(Session& session, const Globals& globals, const broker::Instance& instance, const char* property,
+                   broker::Value value);
 
 /// A Failure (wrong usage) about a word: "'WORD' WHY".
 Failure refused(const std::string& word, const std::string& why, const std::string& hint = {});

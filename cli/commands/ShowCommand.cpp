@@ -6,6 +6,7 @@
 
 #include "cli/commands/Commands.h"
 #include "cli/commands/ViewJson.h"
+#include "cli/output/Capture.h"
 #include "cli/output/Console.h"
 #include "cli/output/Text.h"
 #include "cli/session/HostView.h"
@@ -154,7 +155,19 @@ HostView viewOf(Session& session) {
   return readHostView(session, progress);
 }
 
+/// Rows, to be put together with those of other hosts.
+void writeRows(const HostView& view, const ShowOptions& options, const Layout& layout) {
+  std::vector<const InterfaceRow*> rows = shownRows(view, options.all || !options.names.empty());
+  writeTable(interfaceTable(rows, view.hasSources), layout);
+  if (!options.names.empty()) return;
+  Table suffixes({"SUFFIXES OF THE HOST"});
+  suffixes.keepRowsOnOneLine({});
+  suffixes.add({view.couldAsk(kGeneralSettingClass) ? Cell::list(view.host.suffixes) : Cell("-")});
+  writeTable(suffixes, layout);
+}
+
 void writeView(const HostView& view, const ShowOptions& options, const Layout& layout) {
+  if (layout.rowsAlone) return writeRows(view, options, layout);
   if (!options.names.empty()) {
     for (const InterfaceRow& row : view.interfaces) {
       if (&row != &view.interfaces.front()) write("\n");
@@ -186,11 +199,13 @@ void addShowCommand(CommandLine& line) {
   const auto options = std::make_shared<ShowOptions>();
   line.add("show", "The DNS servers and domains of each interface, and who says so")
       .writesJson()
+      .gathers()
       .examples(
           "  zorvactl show\n"
           "  zorvactl show eth0                            all of one\n"
           "  zorvactl show --output json\n"
-          "  zorvactl show --url http://localhost:5988/root/cimv2")
+          "  zorvactl show --url https://admin@host1       what the server of another host says\n"
+          "  zorvactl show --hosts hosts.txt --user admin  a row for each interface of each host")
       .flag("--all", "Show interfaces without DNS of their own as well", options->all)
       .words("NAME", "An interface; of each the whole is shown", Many::Any, options->names, "INTERFACE")
       .runs<ShowOptions>(showHost, options);

@@ -1,18 +1,21 @@
 #pragma once
 
-// POST over HTTP/1.1, with libcurl. It is loaded when a client is made, because only --url needs it and loading is
-// slow.
+// POST over HTTP/1.1, plain, over TLS or over a Unix socket, with libcurl.
 
+#include <chrono>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <utility>
 #include <vector>
 
-#include "cli/operations/ServerUrl.h"
+#include "cli/operations/Server.h"
 #include "util/NotCopied.h"
 
 namespace zorva::cli {
+
+struct Curl;
 
 struct HttpReply {
   long status = 0;
@@ -24,21 +27,36 @@ struct HttpReply {
 };
 
 /// One server, over connections that are kept open. Used by one thread.
+///
+/// A certificate is checked by libcurl, against authorities and the name in the URL. A pinned one is checked here:
+/// libcurl can pin a key, and not a certificate. It calls back when a connection is there, TLS included, and before
+/// anything is sent on it. There the certificate of this very handshake is compared, so neither the login nor the
+/// request can reach another server.
 class HttpClient : util::NotCopied {
  public:
-  /// Throws Failure if libcurl cannot be loaded.
-  explicit HttpClient(const ServerUrl& server);
+  /// Throws Failure if libcurl cannot be loaded, or a file that the server's trust names cannot be read.
+  explicit HttpClient(const Server& server);
   ~HttpClient();
 
-  /// Sends `body` and waits for the whole reply: ten seconds for the connection, and two minutes for each further byte.
-  /// `fields` are lines like "CIMOperation: MethodCall". Does not follow redirections or use proxies. Throws Failure if
-  /// no reply comes, it is incomplete, or is larger than 256 MiB.
+  /// Sends `body` and waits for the whole reply: ten seconds for the connection, two minutes for each further byte, and
+  /// in all as long as the server's patience says. `fields` are lines like "CIMOperation: MethodCall". Does not follow
+  /// redirections or use proxies. Throws Failure if the server's certificate is not trusted, no reply comes, it is
+  /// incomplete, or is larger than 256 MiB.
   HttpReply post(const std::vector<std::string>& fields, const std::string& body);
 
  private:
-  struct Curl;
+  struct Pin;
+  void placeTrust();
+  void placeLogin();
+  void placeDeadline(Curl& curl) const;
+  [[noreturn]] void fail(int code, const HttpReply& reply) const;
+  [[noreturn]] void refuseCertificate(int code) const;
+  [[noreturn]] void giveUp() const;
+
+  const Server server_;
+  const std::optional<std::chrono::steady_clock::time_point> deadline_;
   std::unique_ptr<Curl> curl_;
-  ServerUrl server_;
+  std::unique_ptr<Pin> pin_;  ///< null: libcurl checks the certificate
 };
 
 }  // namespace zorva::cli

@@ -9,16 +9,16 @@
 #include "cimxml/ResponseReader.h"
 #include "cli/operations/HttpClient.h"
 #include "cli/operations/Operations.h"
-#include "cli/operations/ServerUrl.h"
+#include "cli/operations/Server.h"
 #include "util/Names.h"
 
 namespace zorva::cli {
 
 class RemoteOperations : public Operations {
  public:
-  /// Connects at the first operation. `classes` are known in advance; others are requested. Throws Failure if the URL
-  /// is wrong or libcurl cannot be loaded. The operations throw Failure if the server does not answer with CIM-XML.
-  RemoteOperations(std::string_view url, std::shared_ptr<const schema::ClassRepository> classes);
+  /// Connects at the first operation. `classes` are known in advance; others are requested. Throws Failure as
+  /// HttpClient does. The operations throw Failure if the server does not answer with CIM-XML.
+  RemoteOperations(const Server& server, std::shared_ptr<const schema::ClassRepository> classes);
   ~RemoteOperations() override;
 
   broker::Status enumerateInstances(std::string_view nameSpace, std::string_view className,

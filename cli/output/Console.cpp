@@ -5,6 +5,7 @@
 #include <cstring>
 #include <string>
 
+#include "cli/output/Capture.h"
 #include "cli/output/Failure.h"
 #include "cli/output/Progress.h"
 
@@ -24,6 +25,10 @@ void writeOnlyErrors() {
 void tell(const char* kind, std::string_view what) {
   const std::string_view word(kind);
   if (isQuiet && (word == "warning: " || word == "note: ")) return;
+  if (Capture* capture = Capture::current()) {
+    capture->lines.emplace_back(word, what);
+    return;
+  }
   std::fflush(stdout);
   Progress::makeRoom();
   const std::string line = std::string("zorvactl: ").append(word).append(what) + "\n";
@@ -41,6 +46,10 @@ void tellNote(std::string_view what) { tell("note: ", what); }
 
 void write(std::string_view text) {
   if (isQuiet) return;
+  if (Capture* capture = Capture::current()) {
+    capture->text += text;
+    return;
+  }
   if (std::fwrite(text.data(), 1, text.size(), stdout) != text.size()) flushOutput();
 }
 

@@ -70,6 +70,16 @@ std::string methodResultJson(const broker::MethodResult& result) {
   return dumped(json);
 }
 
+std::string methodCallJson(const broker::ObjectPath& path, const std::string& method,
+                           const std::vector<broker::NamedValue>& input) {
+  Json json;
+  json["path"] = asUtf8(broker::pathText(path));
+  json["method"] = method;
+  json["input"] = Json::object();
+  for (const broker::NamedValue& each : input) json["input"][each.name] = ofValue(each.value);
+  return dumped(json);
+}
+
 std::string textsJson(const std::vector<std::string>& texts) { return dumped(ofTexts(texts)); }
 
 }  // namespace zorva::cli

@@ -21,6 +21,10 @@ std::string pathJson(const broker::ObjectPath& path);
 /// The result of a method: "return_value" and "output".
 std::string methodResultJson(const broker::MethodResult& result);
 
+/// A call of a method that is not made: "path", "method" and "input".
+std::string methodCallJson(const broker::ObjectPath& path, const std::string& method,
+                           const std::vector<broker::NamedValue>& input);
+
 /// A list of texts.
 std::string textsJson(const std::vector<std::string>& texts);
 

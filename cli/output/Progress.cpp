@@ -5,6 +5,8 @@
 
 #include <utility>
 
+#include "cli/output/Capture.h"
+
 namespace zorva::cli {
 
 namespace {
@@ -29,7 +31,7 @@ std::size_t widthOfTerminal() {
 void Progress::neverShow() { isNever = true; }
 
 Progress::Progress() {
-  if (isNever || ::isatty(STDERR_FILENO) == 0) return;
+  if (isNever || Capture::current() != nullptr || ::isatty(STDERR_FILENO) == 0) return;
   {
     const std::lock_guard lock(currentMutex);
     current = this;

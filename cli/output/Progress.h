@@ -11,7 +11,7 @@
 namespace zorva::cli {
 
 /// A line on standard error that says what a long command is doing: only on a terminal, only after half a second, and
-/// erased at the end. One at a time.
+/// erased at the end. One at a time; none on a thread whose output is captured.
 class Progress : util::NotCopied {
  public:
   Progress();

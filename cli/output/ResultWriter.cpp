@@ -3,6 +3,7 @@
 #include <string>
 
 #include "cimxml/ElementWriter.h"
+#include "cli/output/Capture.h"
 #include "cli/output/Console.h"
 #include "cli/output/Failure.h"
 #include "cli/output/JsonOutput.h"
@@ -34,6 +35,30 @@ class TableWriter : public ResultWriter {
  private:
   Layout layout_;
   bool any_ = false;
+};
+
+/// Rows, to be put together with those of other hosts.
+class RowsWriter : public ResultWriter {
+ public:
+  RowsWriter(const Layout& layout, Results results)
+      : layout_(layout),
+        table_(results == Results::Names ? std::vector<std::string>{"OBJECT"}
+                                         : std::vector<std::string>{"OBJECT", "PROPERTY", "VALUE"}) {}
+
+  void add(const broker::Instance& instance) override {
+    const std::string name = shortPathText(instance.path);
+    for (const broker::Property& property : instance.properties) {
+      table_.add({name, property.name, property.value.isNull ? "-" : valueText(property.value, property.declaration)});
+    }
+  }
+
+  void add(const broker::ObjectPath& path) override { table_.add({shortPathText(path)}); }
+
+  void finish() override { writeTable(table_, layout_); }
+
+ private:
+  Layout layout_;
+  Table table_;
 };
 
 class JsonWriter : public ResultWriter {
@@ -113,6 +138,7 @@ std::unique_ptr<ResultWriter> makeResultWriter(OutputFormat format, const Layout
   }
   switch (format) {
     case OutputFormat::Table:
+      if (layout.rowsAlone) return std::make_unique<RowsWriter>(layout, results);
       return std::make_unique<TableWriter>(layout);
     case OutputFormat::Json:
       return std::make_unique<JsonWriter>(count);

@@ -26,12 +26,11 @@ enum class Count { One, Many };
 
 enum class Results { Instances, Names };
 
-/// Table: names one a line, instances as their names with their properties under them.
-/// Json (RFC 8259): a name is a text; an instance is {"class", "path", "properties"}, with null for a null property and
-/// a text for a reference. Many are an array.
-/// Mof (DSP0004): instance declarations.
-/// Xml (DSP0201): one declaration document of the instances with their paths.
-/// Throws Failure (wrong usage) for a format that does not exist for these results.
+/// Table: names one a line, instances as their names with their properties under them; with Layout::rowsAlone one
+/// table. Json (RFC 8259): a name is a text; an instance is {"class", "path", "properties"}, with null for a null
+/// property and a text for a reference. Many are an array. Mof (DSP0004): instance declarations. Xml (DSP0201): one
+/// declaration document of the instances with their paths. Throws Failure (wrong usage) for a format that does not
+/// exist for these results.
 std::unique_ptr<ResultWriter> makeResultWriter(OutputFormat format, const Layout& layout, Count count, Results results);
 
 }  // namespace zorva::cli

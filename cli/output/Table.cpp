@@ -91,6 +91,19 @@ void Table::add(std::vector<Cell> row) {
   rows_.push_back(std::move(row));
 }
 
+void Table::append(const Table& other, const std::string& heading, const std::string& field) {
+  if (headings_.empty()) {
+    headings_.emplace_back(heading, Style::Heading);
+    headings_.insert(headings_.end(), other.headings_.begin(), other.headings_.end());
+    isOneLine_ = other.isOneLine_;
+    for (const Narrowing& each : other.narrowing_) narrowing_.push_back({each.column + 1, each.least});
+  }
+  for (const std::vector<Cell>& row : other.rows_) {
+    rows_.push_back({printable(field)});
+    rows_.back().insert(rows_.back().end(), row.begin(), row.end());
+  }
+}
+
 void Table::keepRowsOnOneLine(std::vector<Narrowing> order) {
   isOneLine_ = true;
   narrowing_ = std::move(order);

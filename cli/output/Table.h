@@ -16,6 +16,7 @@ enum class Style { Plain, Heading, Good, Warning, Bad, Faint };
 struct Layout {
   std::size_t width = 0;  ///< columns of the terminal; 0: no terminal, so no limit
   bool colours = false;
+  bool rowsAlone = false;  ///< a result is rows of tables with headings, to be put together with those of other hosts
 
   /// The layout of standard output: colours and a width only if it is a terminal; no colours if NO_COLOR is set and not
   /// empty, or the terminal is a dumb one.
@@ -57,6 +58,10 @@ class Table {
   void add(std::vector<Cell> row);
 
   bool empty() const noexcept { return rows_.empty(); }
+
+  /// Adds the rows of another table, with this first field and all else as that table has it; `heading` is that of the
+  /// field.
+  void append(const Table& other, const std::string& heading, const std::string& field);
 
   /// Puts each row on one line: a field that is too wide is cut, also a list where there is no terminal. These columns
   /// are narrowed first, in this order.

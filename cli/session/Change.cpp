@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <optional>
 
+#include "cli/output/Capture.h"
 #include "cli/output/Console.h"
 #include "cli/output/Failure.h"
 #include "cli/output/Table.h"
@@ -79,6 +80,22 @@ void requireModified(const broker::ObjectPath& path, const broker::Status& statu
 
 }  // namespace
 
+namespace {
+
+/// The changed values, as rows to be put together with those of other hosts.
+void writeChangedRows(const Session& session, const broker::Instance& instance,
+                      const std::vector<broker::Property>& changes) {
+  Table table({"OBJECT", "PROPERTY", "VALUE"});
+  for (const broker::Property& change : changes) {
+    const broker::Value* value = instance.property(change.name);
+    const bool isNull = value == nullptr || value->isNull;
+    table.add({shortPathText(instance.path), change.name, isNull ? "-" : valueText(*value, change.declaration)});
+  }
+  writeTable(table, session.layout());
+}
+
+}  // namespace
+
 void bringToHost(const broker::ObjectPath& path) {
   const frontend::HostEffect effect = frontend::applyToHost(path, frontend::SettingsLockIs::Held);
   if (!effect.status.ok())
@@ -114,6 +131,7 @@ broker::Instance changeInstance(Session& session, const broker::ObjectPath& path
 
 void writeChanges(const Session& session, const broker::Instance& instance,
                   const std::vector<broker::Property>& changes, const ChangeOptions& options) {
+  if (session.layout().rowsAlone) return writeChangedRows(session, instance, changes);
   write(std::string(options.dryRun ? "would send " : "") + printable(shortPathText(instance.path)) + "\n");
   Table table({}, 2);
   if (options.dryRun) {

@@ -11,6 +11,7 @@
 #include "cli/output/Console.h"
 #include "cli/output/Failure.h"
 #include "cli/output/Text.h"
+#include "cli/session/LocalServer.h"
 #include "schema/Schema.h"
 #include "util/LogLevels.h"
 #include "util/Names.h"
@@ -78,10 +79,11 @@ class Finally {
 
 Session::Session(const Globals& globals)
     : layout_(Layout::ofStandardOutput()),
-      url_(globals.url),
+      server_(globals.server),
       logLevel_(globals.logLevel.value_or(util::kLevelError)),
       wantsLog_(globals.logLevel.has_value()),
       providerDirectory_(globals.providerDirectory) {
+  layout_.rowsAlone = globals.isOneOfMany;
   if (isRemote()) return;
   asFailure([&] {
     zorva::agent::loadConfig(globals.config);
@@ -119,7 +121,7 @@ std::shared_ptr<const zorva::agent::TreeSnapshot> Session::tree() const {
 Operations& Session::cim() {
   if (cim_ != nullptr) return *cim_;
   if (isRemote()) {
-    cim_ = std::make_unique<RemoteOperations>(url_, classes());
+    cim_ = std::make_unique<RemoteOperations>(*server_, classes());
     return *cim_;
   }
   tree();
@@ -139,7 +141,8 @@ Session::Changing::Changing(Session& session, bool isDryRun) : quiet_(session) {
   } catch (const std::runtime_error& error) {
     const bool isMissing = ::access(zorva::agent::dataDirectory().c_str(), F_OK) != 0;
     throw Failure(ExitCode::Failed, "nothing was changed: " + printable(error.what()),
-                  isMissing ? "make the data directory, or name another: data_dir in the agent's configuration" : "");
+                  isMissing ? "make the data directory, or name another: data_dir in the agent's configuration"
+                            : hintForUnprivileged());
   }
 }
 

@@ -35,10 +35,10 @@ class Session {
 
   /// True if a server is used, and not the providers in this process. Then the host is only known through CIM, and
   /// tree() must not be called.
-  bool isRemote() const noexcept { return !url_.empty(); }
+  bool isRemote() const noexcept { return server_.has_value(); }
 
-  /// The server's URL as given.
-  const std::string& url() const noexcept { return url_; }
+  /// The server's address for messages; there must be one.
+  std::string shownServer() const { return server_->url.shown(); }
 
   /// The current tree of the host. Throws Failure if it, or the file that replaces it, cannot be read.
   std::shared_ptr<const zorva::agent::TreeSnapshot> tree() const;
@@ -88,7 +88,7 @@ class Session {
   void placeLogSink() const;
 
   Layout layout_;
-  std::string url_;
+  std::optional<Server> server_;
   int logLevel_;
   bool wantsLog_;
   int quiet_ = 0;  ///< number of living Quiet objects
