@@ -141,7 +141,9 @@ void invokeMethod(const Globals& globals, const InvokeOptions& options) {
   if (globals.dryRun) return writeCall(globals, session, path, method, input);
   const auto result = session.cim().invokeMethod(path, method.name, input);
   if (!result) {
-    throw operationFailure(method.name + " of " + shortPathText(path), result.error(), parametersOf(method));
+    const std::string hint = nextStepIfDenied(session, result.error());
+    throw operationFailure(method.name + " of " + shortPathText(path), result.error(),
+                           hint.empty() ? parametersOf(method) : hint);
   }
   if (globals.output == OutputFormat::Json) {
     write(methodResultJson(*result) + "\n");

@@ -123,8 +123,8 @@ bool isUsage(const HostOutcome& outcome) {
   return outcome.failure && outcome.failure->exitCode() == ExitCode::WrongUsage;
 }
 
-/// Writes and tells all. Throws Failure if a host failed.
-void report(const Globals& globals, const std::vector<HostOutcome>& outcomes) {
+/// Writes and tells all. Throws Failure if a host failed; its message ends in `consequence`.
+void report(const Globals& globals, const std::vector<HostOutcome>& outcomes, const std::string& consequence = {}) {
   if (globals.output == OutputFormat::Json) {
     writeJson(outcomes);
   } else {
@@ -133,20 +133,21 @@ void report(const Globals& globals, const std::vector<HostOutcome>& outcomes) {
   const std::size_t failed = tellOutcomes(outcomes);
   if (failed == 0) return;
   throw Failure(std::all_of(outcomes.begin(), outcomes.end(), isUsage) ? ExitCode::WrongUsage : ExitCode::Failed,
-                std::to_string(failed) + " of " + counted(outcomes.size(), "host") + " failed");
+                std::to_string(failed) + " of " + counted(outcomes.size(), "host") + " failed" + consequence,
+                consequence.empty() ? "" : "--yes changes it on the others");
 }
 
-/// Shows what the change would do, and throws Failure unless the person at the terminal agrees to it.
+/// Shows what the change would do, and throws Failure unless the person at the terminal agrees to it, or where it
+/// cannot be done on all hosts.
 void requireAgreement(const Globals& globals, const std::vector<Server>& servers, const Command& command) {
   Globals shown = globals;
   shown.dryRun = true;
-  const std::vector<HostOutcome> outcomes = runAll(shown, servers, command);
-  report(shown, outcomes);
+  report(shown, runAll(shown, servers, command), globals.dryRun ? "" : "; nothing was changed");
   if (globals.dryRun) return;
   flushOutput();
   const bool hasPerson = ::isatty(STDIN_FILENO) != 0 && !globals.quiet;
   const auto answer = hasPerson
-                          ? askTerminal("change this on " + counted(servers.size(), "host") + "? [y/N] ", Echo::Shown)
+                          ? askTerminal("change this on " + counted(servers.size(), "host") + "? [y/N]: ", Echo::Shown)
                           : std::nullopt;
   if (answer && (*answer == "y" || *answer == "yes")) return;
   throw Failure(ExitCode::Failed,
@@ -187,8 +188,8 @@ void runOnHosts(const Globals& globals, const std::string& name, CommandNature n
   Globals one = globals;
   if (!servers.empty()) {
     one.server = std::move(servers.front());
-  } else if (nature.changes && !globals.dryRun) {
-    one.server = serverInstead(globals);
+  } else if (nature.gathers) {
+    one.server = serverInstead(globals, nature.changes && !globals.dryRun ? Need::Change : Need::Read);
   }
   command(one);
 }

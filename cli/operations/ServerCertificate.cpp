@@ -2,10 +2,12 @@
 
 #include <dlfcn.h>
 
+#include <algorithm>
 #include <array>
 #include <string_view>
 
 #include "cli/output/Text.h"
+#include "util/Names.h"
 #include "util/Text.h"
 
 namespace zorva::cli {
@@ -54,11 +56,12 @@ std::optional<std::string> bytesOfPem(std::string_view pem) {
   return bytes;
 }
 
-/// "Start date:2026-01-01 ..." has the name "Start date".
+/// "Start date:2026-01-01 ..." has the name "Start date", or with GnuTLS "Start Date".
 std::string fieldOf(const curl_slist* fields, std::string_view name) {
   for (; fields != nullptr; fields = fields->next) {
     const std::string_view field = fields->data;
-    if (field.starts_with(name) && field.substr(name.size()).starts_with(':')) {
+    if (util::sameName(field.substr(0, name.size()), name) &&
+        field.substr(std::min(name.size(), field.size())).starts_with(':')) {
       return std::string(util::trimmed(field.substr(name.size() + 1), util::kWhiteSpace));
     }
   }

@@ -69,13 +69,13 @@ broker::Status checkFiles(const broker::Instance& now, const std::vector<broker:
   return frontend::statusOf(lost);
 }
 
-void requireModified(const broker::ObjectPath& path, const broker::Status& status) {
+void requireModified(const Session& session, const broker::ObjectPath& path, const broker::Status& status) {
   if (status.ok()) return;
   throw operationFailure("modifying " + shortPathText(path), status,
                          status.rc == CMPI_RC_ERR_INVALID_PARAMETER
                              ? "a host or domain name may hold letters, digits, '-', '_' and '.'; what else was to be "
                                "changed may be stored already: zorvactl get shows it"
-                             : "");
+                             : nextStepIfDenied(session, status));
 }
 
 }  // namespace
@@ -119,10 +119,10 @@ broker::Instance changeInstance(Session& session, const broker::ObjectPath& path
     propertyList.emplace();
     for (const broker::Property& change : changes) propertyList->push_back(change.name);
   }
-  requireModified(found.path, session.cim().modifyInstance(sent, propertyList));
+  requireModified(session, found.path, session.cim().modifyInstance(sent, propertyList));
   broker::Instance now = fetched(session, found.path);
   // Local changes have been checked already, under the same lock.
-  requireModified(found.path,
+  requireModified(session, found.path,
                   session.isRemote() ? frontend::checkChanges(now, changes, reasonThere) : checkFiles(now, changes));
   // A server that is asked does this itself.
   if (!session.isRemote()) bringToHost(found.path);

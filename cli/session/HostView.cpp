@@ -301,7 +301,7 @@ std::string systemNameOf(Session& session, HostView& view) {
   for (const broker::Instance& instance : askedFor(session, kSystemClass, view)) {
     if (instance.path.className == kSystemClass) return propertyText(instance, "Name");
   }
-  return session.shownServer();
+  return session.server().shown();
 }
 
 }  // namespace

@@ -4,6 +4,7 @@
 #include <sys/un.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <cstdlib>
 #include <cstring>
 
@@ -32,28 +33,35 @@ bool answers(const std::string& socket) {
   return connection && ::connect(connection.get(), reinterpret_cast<sockaddr*>(&address), sizeof address) == 0;
 }
 
-bool mayWriteSettings() {
-  return ::geteuid() == 0 || ::access(zorva::agent::dataDirectory().c_str(), W_OK | X_OK) == 0;
+/// A directory that does not exist holds nothing back from anybody.
+bool mayReach(Need need) {
+  if (::geteuid() == 0) return true;
+  const int mode = need == Need::Read ? R_OK | X_OK : W_OK | X_OK;
+  return ::access(zorva::agent::dataDirectory().c_str(), mode) == 0 || errno != EACCES;
 }
 
 }  // namespace
 
-std::optional<Server> serverInstead(const Globals& globals) {
-  const bool isUsualHost = globals.config.empty() && globals.providerDirectory.empty() && !isSet("ZORVAGENT_CONFIG");
-  if (!isUsualHost && !isSet("ZORVACTL_SOCKET")) return std::nullopt;
+std::optional<Server> serverInstead(const Globals& globals, Need need) {
+  if (::geteuid() == 0) return std::nullopt;
   asFailure([&] { zorva::agent::loadConfig(globals.config); });
-  if (mayWriteSettings() || !answers(usualSocket())) return std::nullopt;
-  Server server{readServerUrl("unix:")};
-  server.patience = globals.servers.timeout;
-  tellNote("this user may not write to " + printable(zorva::agent::dataDirectory()) + "; the server at " +
-           printable(server.url.shown()) + " is asked to do it");
-  return server;
+  if (mayReach(need)) return std::nullopt;
+  const bool isUsualHost = globals.config.empty() && globals.providerDirectory.empty() && !isSet("ZORVAGENT_CONFIG");
+  const std::string what = std::string("this user may not ") + (need == Need::Read ? "read " : "write to ") +
+                           printable(zorva::agent::dataDirectory());
+  if ((isUsualHost || isSet("ZORVACTL_SOCKET")) && answers(usualSocket())) {
+    Server server{readServerUrl("unix:")};
+    server.patience = globals.servers.timeout;
+    tellNote(what + "; the server at " + printable(server.url.shown()) + " is asked");
+    return server;
+  }
+  if (need == Need::Read) tellWarning(what + "; the settings that are stored there are not shown");
+  return std::nullopt;
 }
 
 std::string hintForUnprivileged() {
-  if (mayWriteSettings()) return {};
-  return "run it as root, or as a member of the group zorva where zorvacimd runs; no server answers at " +
-         printable(usualSocket());
+  if (mayReach(Need::Change)) return {};
+  return "run it as root; or, where zorvacimd runs, as a member of the group zorva with --url unix:";
 }
 
 }  // namespace zorva::cli

@@ -10,10 +10,13 @@
 
 namespace zorva::cli {
 
-/// The server through which a change goes: nothing for root and for who may write to the data directory, and where no
-/// server answers at the usual socket. A note tells that it is used. It is not used where the command line or the
-/// environment names a configuration: the server may have another one, and so another host's settings.
-std::optional<Server> serverInstead(const Globals& globals);
+enum class Need { Read, Change };
+
+/// The server through which a command goes that reads or changes settings: nothing for who may do that in the data
+/// directory, as root may, and where no server answers at the usual socket. A note tells that it is used. It is not
+/// used where the command line or the environment names a configuration: the server may have another one, and so
+/// another host's settings. A warning tells if settings cannot be read at all.
+std::optional<Server> serverInstead(const Globals& globals, Need need);
 
 /// What a user may do who may not write to the data directory; empty if that is not the reason.
 std::string hintForUnprivileged();

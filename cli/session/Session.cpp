@@ -1,5 +1,6 @@
 #include "cli/session/Session.h"
 
+#include <cmpidt.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -95,9 +96,14 @@ Session::Session(const Globals& globals)
 Session::~Session() = default;
 
 const std::shared_ptr<const schema::ClassRepository>& Session::classes() {
-  // A server may also have the classes that describe it.
-  const auto set = isRemote() ? schema::ClassSet::Interop : schema::ClassSet::Profile;
-  if (classes_ == nullptr) classes_ = schema::loadBuiltInClasses(set);
+  if (classes_ != nullptr) return classes_;
+  if (isRemote()) {
+    // A server may also have the classes that describe it. Those of many servers are the same.
+    static const auto shared = schema::loadBuiltInClasses(schema::ClassSet::Interop);
+    classes_ = shared;
+  } else {
+    classes_ = schema::loadBuiltInClasses(schema::ClassSet::Profile);
+  }
   return classes_;
 }
 
@@ -175,6 +181,14 @@ void Session::log(broker::LogLevel level, std::string_view text) const {
 bool Session::isThisHost(std::string_view name) const {
   return isRemote() || util::sameName(name, "localhost") || util::sameName(name, tree()->systemName()) ||
          util::sameName(name, zorva::agent::currentConfig().systemName);
+}
+
+std::string nextStepIfDenied(const Session& session, const broker::Status& status) {
+  if (!session.isRemote() || status.rc != CMPI_RC_ERR_ACCESS_DENIED) return {};
+  const ServerUrl& server = session.server();
+  if (server.isSocket()) return "root and the members of the group zorva may change settings there";
+  if (!server.user.empty()) return "'zorvactl user role', run on that host, gives the user the role operate";
+  return "log in as a user with the role operate: --url https://USER@" + (server.isEncrypted() ? server.host : "HOST");
 }
 
 broker::Selection selectionOf(Session& session, const std::vector<std::string>& properties, const schema::Class* top) {

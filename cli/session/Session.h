@@ -37,8 +37,8 @@ class Session {
   /// tree() must not be called.
   bool isRemote() const noexcept { return server_.has_value(); }
 
-  /// The server's address for messages; there must be one.
-  std::string shownServer() const { return server_->url.shown(); }
+  /// The address of the server; there must be one.
+  const ServerUrl& server() const { return server_->url; }
 
   /// The current tree of the host. Throws Failure if it, or the file that replaces it, cannot be read.
   std::shared_ptr<const zorva::agent::TreeSnapshot> tree() const;
@@ -97,6 +97,9 @@ class Session {
   frontend::SettingsClaims claims_;
   std::unique_ptr<Operations> cim_;
 };
+
+/// What to do where a server denies a change to this client; empty for any other status, and without a server.
+std::string nextStepIfDenied(const Session& session, const broker::Status& status);
 
 /// Runs the work and converts the agent's exceptions to Failure: a wrong file is wrong usage, everything else a
 /// failure.

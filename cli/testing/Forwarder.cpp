@@ -15,23 +15,24 @@ namespace zorva::cli {
 
 namespace {
 
-sockaddr_in loopback(const std::string& port) {
+sockaddr_in loopback(const std::string& port, const std::string& host = "127.0.0.1") {
   sockaddr_in address{};
   address.sin_family = AF_INET;
   address.sin_port = htons(static_cast<std::uint16_t>(std::stoul(port)));
-  address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+  ::inet_pton(AF_INET, host.c_str(), &address.sin_addr);
   return address;
 }
 
+/// `address` is the host first, and then with the port.
 util::FileDescriptor listenOnLoopback(std::string& address) {
   util::FileDescriptor listener(::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0));
-  sockaddr_in bound = loopback("0");
+  sockaddr_in bound = loopback("0", address);
   socklen_t size = sizeof bound;
   if (::bind(listener.get(), reinterpret_cast<sockaddr*>(&bound), size) != 0 || ::listen(listener.get(), 64) != 0) {
     throw std::runtime_error("no port");
   }
   ::getsockname(listener.get(), reinterpret_cast<sockaddr*>(&bound), &size);
-  address = "127.0.0.1:" + std::to_string(ntohs(bound.sin_port));
+  address += ":" + std::to_string(ntohs(bound.sin_port));
   return listener;
 }
 
@@ -116,8 +117,8 @@ struct Forwarder::Credentials : util::NotCopied {
   gnutls_certificate_credentials_t all = nullptr;
 };
 
-Forwarder::Forwarder(const TestCertificate& certificate, const std::string& target)
-    : target_(target), credentials_(std::make_unique<Credentials>(certificate)) {
+Forwarder::Forwarder(const TestCertificate& certificate, const std::string& target, const std::string& address)
+    : target_(target), url_(address), credentials_(std::make_unique<Credentials>(certificate)) {
   listener_ = listenOnLoopback(url_);
   url_ = "https://" + url_;
   thread_ = std::thread([this] { serve(); });
@@ -191,6 +192,6 @@ void Forwarder::forward(int client) {
   ::close(client);
 }
 
-SilentServer::SilentServer() : listener_(listenOnLoopback(address_)) {}
+SilentServer::SilentServer(const std::string& host) : address_(host) { listener_ = listenOnLoopback(address_); }
 
 }  // namespace zorva::cli

@@ -19,8 +19,8 @@ namespace zorva::cli {
 /// Hands each connection on to "http://127.0.0.1:PORT".
 class Forwarder : util::NotCopied {
  public:
-  /// A TLS server with this certificate, on a port of its own.
-  Forwarder(const TestCertificate& certificate, const std::string& target);
+  /// A TLS server with this certificate, on a port of its own at this loopback address.
+  Forwarder(const TestCertificate& certificate, const std::string& target, const std::string& address = "127.0.0.1");
 
   /// A Unix socket of that path.
   Forwarder(const std::string& socket, const std::string& target);
@@ -55,7 +55,7 @@ class Forwarder : util::NotCopied {
 /// A port at which connections are taken, and nothing is ever answered.
 class SilentServer : util::NotCopied {
  public:
-  SilentServer();
+  explicit SilentServer(const std::string& host = "127.0.0.1");
   const std::string& address() const { return address_; }  ///< "127.0.0.1:40000"
 
  private:

@@ -15,6 +15,7 @@
 #include <array>
 #include <filesystem>
 #include <stdexcept>
+#include <thread>
 
 #include "cli/output/Text.h"
 
@@ -78,8 +79,12 @@ int exitCodeOf(pid_t child) {
   return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
 }
 
+<<<<<<< HEAD
 [[noreturn]] void become(const std::vector<std::string>& words, int in, int out, int err) {
   ::dup2(in, STDIN_FILENO);
+=======
+[[noreturn]] void become(const std::vector<std::string>& words, int out, int err) {
+>>>>>>> 08a3e20 (zorvactl: who may not write or read the data directory asks the server at the socket; tests and documents of remote use)
   ::dup2(out, STDOUT_FILENO);
   ::dup2(err, STDERR_FILENO);
   std::vector<char*> arguments;
@@ -167,14 +172,52 @@ Outcome TestHost::runOnFreshMachine(const std::vector<std::string>& words) const
   return runPrepared(hide, {}, words, OutputTo::Pipe);
 }
 
-Outcome TestHost::runUnprivileged(const std::vector<std::string>& words) const {
+Outcome TestHost::runUnprivileged(const std::vector<std::string>& words, unsigned mode) const {
   const unsigned unprivileged = 65534;
   const bool isRoot = ::geteuid() == 0;
   ::chmod(directory_.path().c_str(), 0755);
-  ::chmod(dataFile("").c_str(), isRoot ? 0755 : 0555);
-  const auto become = [&] { return !isRoot || ::setuid(unprivileged) == 0; };
+  ::chmod(dataFile("").c_str(), isRoot ? mode : mode & 0555U);
+  const auto become = [&] { return !isRoot || (::setgid(unprivileged) == 0 && ::setuid(unprivileged) == 0); };
   Outcome outcome = runPrepared(become, {}, words, OutputTo::Pipe);
   ::chmod(dataFile("").c_str(), 0755);
+  return outcome;
+}
+
+Outcome TestHost::runReading(const std::string& input, const std::vector<std::string>& words) const {
+  const Pair pipe = makePipe();
+  const bool isWritten = ::write(pipe.writer, input.data(), input.size()) == static_cast<ssize_t>(input.size());
+  ::close(pipe.writer);
+  Outcome outcome =
+      runPrepared([&] { return isWritten && ::dup2(pipe.reader, STDIN_FILENO) >= 0; }, {}, words, OutputTo::Pipe);
+  ::close(pipe.reader);
+  return outcome;
+}
+
+Outcome TestHost::runAsking(const std::string& typed, std::string& shown, const std::vector<std::string>& words) const {
+  const Pair terminal = makeTerminal();
+  std::thread person([&] {
+    char buffer[256];
+    bool hasTyped = false;
+    for (;;) {
+      const ssize_t count = ::read(terminal.reader, buffer, sizeof buffer);
+      if (count <= 0) return;
+      shown.append(buffer, static_cast<std::size_t>(count));
+      if (!hasTyped && shown.ends_with(": ")) hasTyped = ::write(terminal.reader, typed.data(), typed.size()) > 0;
+      if (shown.ends_with("\004")) return;
+    }
+  });
+  Outcome outcome = runPrepared(
+      [&] {
+        return ::setsid() >= 0 && ::ioctl(terminal.writer, TIOCSCTTY, 0) == 0 &&
+               ::dup2(terminal.writer, STDIN_FILENO) >= 0;
+      },
+      {}, words, OutputTo::Pipe);
+  // The end of the terminal's text, for the reader: the terminal itself stays open here.
+  (void)!::write(terminal.writer, "\004", 1);
+  person.join();
+  shown.pop_back();
+  ::close(terminal.writer);
+  ::close(terminal.reader);
   return outcome;
 }
 
@@ -192,6 +235,7 @@ Outcome TestHost::runPrepared(const std::function<bool()>& prepare, const Enviro
     ::setenv("TERM", "xterm", 1);
     ::unsetenv("NO_COLOR");
     for (const auto& [name, value] : environment) ::setenv(name.c_str(), value.c_str(), 1);
+    ::dup2(::open("/dev/null", O_RDONLY), STDIN_FILENO);
     if (!prepare()) ::_exit(127);
     become(words, in.reader, out.writer, err.writer);
   }

@@ -39,8 +39,15 @@ class TestHost {
   Outcome runWithInput(const std::string& input, const std::vector<std::string>& words) const;
 
   /// If root runs the tests, runs it as a user who owns nothing here; else as the same user, with the host's
-  /// directories closed to writing. Exit code 127: that user cannot run the program.
-  Outcome runUnprivileged(const std::vector<std::string>& words) const;
+  /// directories closed to writing. The data directory has these rights. Exit code 127: that user cannot run the
+  /// program.
+  Outcome runUnprivileged(const std::vector<std::string>& words, unsigned mode = 0755) const;
+
+  /// Runs it with this text on standard input.
+  Outcome runReading(const std::string& input, const std::vector<std::string>& words) const;
+
+  /// Runs it at a terminal, at which `typed` is typed when it asks something. `shown` gets what the terminal showed.
+  Outcome runAsking(const std::string& typed, std::string& shown, const std::vector<std::string>& words) const;
 
   /// The effect of writing more than a file may hold.
   enum class AtLimit { WriteFails, IsKilled };
