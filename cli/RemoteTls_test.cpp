@@ -242,7 +242,7 @@ TEST_F(RemoteLogin, TakesThePasswordOfAFile) {
 }
 
 TEST_F(RemoteLogin, TakesThePasswordOfStandardInput) {
-  expectLoggedIn(host_.runReading("pass word\n", words({"--password-file", "-"})));
+  expectLoggedIn(host_.runWithInput("pass word\n", words({"--password-file", "-"})));
 }
 
 TEST_F(RemoteLogin, AsksForThePasswordAtTheTerminalAndDoesNotShowIt) {

@@ -79,12 +79,7 @@ int exitCodeOf(pid_t child) {
   return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
 }
 
-<<<<<<< HEAD
-[[noreturn]] void become(const std::vector<std::string>& words, int in, int out, int err) {
-  ::dup2(in, STDIN_FILENO);
-=======
 [[noreturn]] void become(const std::vector<std::string>& words, int out, int err) {
->>>>>>> 08a3e20 (zorvactl: who may not write or read the data directory asks the server at the socket; tests and documents of remote use)
   ::dup2(out, STDOUT_FILENO);
   ::dup2(err, STDERR_FILENO);
   std::vector<char*> arguments;
@@ -149,10 +144,6 @@ Outcome TestHost::runWith(const std::vector<std::pair<std::string, std::string>>
   return runPrepared([] { return true; }, environment, words, output);
 }
 
-Outcome TestHost::runWithInput(const std::string& input, const std::vector<std::string>& words) const {
-  return runPrepared([] { return true; }, {}, words, OutputTo::Pipe, input);
-}
-
 Outcome TestHost::runLimited(std::size_t bytes, AtLimit atLimit, const std::vector<std::string>& words) const {
   const auto limit = [&] {
     const rlimit size{bytes, bytes};
@@ -183,7 +174,7 @@ Outcome TestHost::runUnprivileged(const std::vector<std::string>& words, unsigne
   return outcome;
 }
 
-Outcome TestHost::runReading(const std::string& input, const std::vector<std::string>& words) const {
+Outcome TestHost::runWithInput(const std::string& input, const std::vector<std::string>& words) const {
   const Pair pipe = makePipe();
   const bool isWritten = ::write(pipe.writer, input.data(), input.size()) == static_cast<ssize_t>(input.size());
   ::close(pipe.writer);
@@ -222,11 +213,8 @@ Outcome TestHost::runAsking(const std::string& typed, std::string& shown, const 
 }
 
 Outcome TestHost::runPrepared(const std::function<bool()>& prepare, const Environment& environment,
-                              const std::vector<std::string>& words, OutputTo output, const std::string& input) const {
+                              const std::vector<std::string>& words, OutputTo output) const {
   const Pair out = makeOutput(output);
-  const Pair in = makePipe();
-  if (::write(in.writer, input.data(), input.size()) < 0) throw std::runtime_error("no input");
-  ::close(in.writer);
   const Pair err = output == OutputTo::ErrorTerminal ? makeTerminal() : makePipe();
   const pid_t child = ::fork();
   if (child < 0) throw std::runtime_error("no process");
@@ -237,9 +225,8 @@ Outcome TestHost::runPrepared(const std::function<bool()>& prepare, const Enviro
     for (const auto& [name, value] : environment) ::setenv(name.c_str(), value.c_str(), 1);
     ::dup2(::open("/dev/null", O_RDONLY), STDIN_FILENO);
     if (!prepare()) ::_exit(127);
-    become(words, in.reader, out.writer, err.writer);
+    become(words, out.writer, err.writer);
   }
-  ::close(in.reader);
   ::close(out.writer);
   ::close(err.writer);
   Outcome outcome;

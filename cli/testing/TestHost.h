@@ -43,9 +43,6 @@ class TestHost {
   /// program.
   Outcome runUnprivileged(const std::vector<std::string>& words, unsigned mode = 0755) const;
 
-  /// Runs it with this text on standard input.
-  Outcome runReading(const std::string& input, const std::vector<std::string>& words) const;
-
   /// Runs it at a terminal, at which `typed` is typed when it asks something. `shown` gets what the terminal showed.
   Outcome runAsking(const std::string& typed, std::string& shown, const std::vector<std::string>& words) const;
 
@@ -72,7 +69,7 @@ class TestHost {
  private:
   using Environment = std::vector<std::pair<std::string, std::string>>;
   Outcome runPrepared(const std::function<bool()>& prepare, const Environment& environment,
-                      const std::vector<std::string>& words, OutputTo output, const std::string& input = {}) const;
+                      const std::vector<std::string>& words, OutputTo output) const;
 
   zorva::agent::testing::TemporaryDirectory directory_;
 };
