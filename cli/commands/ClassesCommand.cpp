@@ -2,7 +2,6 @@
 
 #include "cli/commands/Commands.h"
 #include "cli/commands/ViewJson.h"
-#include "cli/output/Capture.h"
 #include "cli/output/Console.h"
 #include "cli/session/ClassRows.h"
 #include "cli/session/Session.h"

@@ -2,7 +2,6 @@
 
 #include <algorithm>
 
-#include "cli/output/Capture.h"
 #include "cli/output/Console.h"
 #include "cli/output/JsonOutput.h"
 #include "cli/output/Text.h"

@@ -6,7 +6,6 @@
 
 #include "cli/commands/Commands.h"
 #include "cli/commands/ViewJson.h"
-#include "cli/output/Capture.h"
 #include "cli/output/Console.h"
 #include "cli/output/Text.h"
 #include "cli/session/HostView.h"

@@ -25,7 +25,4 @@ class Capture : util::NotCopied {
   std::vector<std::pair<std::string, std::string>> lines;  ///< for standard error: the kind of the line, and its text
 };
 
-/// Writes a table to standard output.
-void writeTable(const Table& table, const Layout& layout);
-
 }  // namespace zorva::cli

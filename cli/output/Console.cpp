@@ -53,6 +53,14 @@ void write(std::string_view text) {
   if (std::fwrite(text.data(), 1, text.size(), stdout) != text.size()) flushOutput();
 }
 
+void writeTable(const Table& table, const Layout& layout) {
+  if (Capture* capture = Capture::current()) {
+    capture->tables.push_back(table);
+  } else {
+    write(table.text(layout));
+  }
+}
+
 void flushOutput() {
   if (std::fflush(stdout) == 0 && std::ferror(stdout) == 0) return;
   throw Failure(ExitCode::Failed, std::string("cannot write to standard output: ") + std::strerror(errno));

@@ -4,6 +4,8 @@
 
 #include <string_view>
 
+#include "cli/output/Table.h"
+
 namespace zorva::cli {
 
 /// From now on only errors are written: neither results nor warnings nor notes.
@@ -23,6 +25,9 @@ void tellNote(std::string_view what);
 
 /// Writes to standard output. Throws Failure if that fails.
 void write(std::string_view text);
+
+/// Writes a table to standard output.
+void writeTable(const Table& table, const Layout& layout);
 
 /// Writes the buffered output. Throws Failure as write does.
 void flushOutput();

@@ -3,7 +3,6 @@
 #include <string>
 
 #include "cimxml/ElementWriter.h"
-#include "cli/output/Capture.h"
 #include "cli/output/Console.h"
 #include "cli/output/Failure.h"
 #include "cli/output/JsonOutput.h"

@@ -5,7 +5,6 @@
 #include <algorithm>
 #include <optional>
 
-#include "cli/output/Capture.h"
 #include "cli/output/Console.h"
 #include "cli/output/Failure.h"
 #include "cli/output/Table.h"

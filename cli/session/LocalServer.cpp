@@ -12,7 +12,7 @@
 #include "agent/config/Config.h"
 #include "cli/output/Console.h"
 #include "cli/output/Text.h"
-#include "cli/session/Session.h"
+#include "cli/session/AsFailure.h"
 #include "util/FileDescriptor.h"
 
 namespace zorva::cli {

@@ -17,6 +17,7 @@
 #include "cli/output/Failure.h"
 #include "cli/output/Table.h"
 #include "cli/output/Text.h"
+#include "cli/session/AsFailure.h"
 #include "cli/session/Globals.h"
 #include "frontend/SettingsClaims.h"
 
@@ -100,21 +101,6 @@ class Session {
 
 /// What to do where a server denies a change to this client; empty for any other status, and without a server.
 std::string nextStepIfDenied(const Session& session, const broker::Status& status);
-
-/// Runs the work and converts the agent's exceptions to Failure: a wrong file is wrong usage, everything else a
-/// failure.
-template <typename Work>
-auto asFailure(Work work) {
-  try {
-    return work();
-  } catch (const zorva::agent::ConfigError& error) {
-    throw Failure(ExitCode::WrongUsage, error.what());
-  } catch (const Failure&) {
-    throw;
-  } catch (const std::runtime_error& error) {
-    throw Failure(ExitCode::Failed, printable(error.what()));
-  }
-}
 
 /// The properties to include of each instance; empty means all. Throws Failure (wrong usage) if neither `top` nor one
 /// of its subclasses (without `top`: no class at all) has a property of such a name.
