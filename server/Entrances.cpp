@@ -98,19 +98,19 @@ void checkLogins(const Config& config, bool hasUsers) {
 std::vector<http::Listener> openListeners(const Config& config, bool hasUsers) {
   const bool hasTls = !config.tls.certificate.empty();
   const http::Inherited inherited = inheritedSockets();
-  std::vector<http::Listener> listeners;
-  if (inherited.count > 0) {
-    listeners = http::adoptListeners(inherited, hasTls ? std::optional<int>(config.tlsPort) : std::nullopt);
-    for (const http::Listener& each : listeners) {
-      if (!each.isLocal) requireLogins(config, hasUsers, each.url);
-    }
-    std::stable_sort(listeners.begin(), listeners.end(), [](const auto& a, const auto& b) { return a.door < b.door; });
-    return listeners;
+  std::vector<http::Listener> listeners =
+      http::adoptListeners(inherited, hasTls ? std::optional<int>(config.tlsPort) : std::nullopt);
+  for (const http::Listener& each : listeners) {
+    if (!each.isLocal) requireLogins(config, hasUsers, each.url);
   }
   checkLogins(config, hasUsers);
-  listeners = http::listenOn(config.addresses, config.port);
-  if (hasTls) addAll(listeners, http::listenOn(config.tlsAddresses, config.tlsPort, http::Door::Https));
-  addUnixListener(config, listeners);
+  if (inherited.count == 0) addAll(listeners, http::listenOn(config.addresses, config.port));
+  const bool isHttpsThere =
+      std::any_of(listeners.begin(), listeners.end(), [](const auto& each) { return each.door == http::Door::Https; });
+  if (hasTls && !isHttpsThere) {
+    addAll(listeners, http::listenOn(config.tlsAddresses, config.tlsPort, http::Door::Https));
+  }
+  if (inherited.count == 0) addUnixListener(config, listeners);
   return listeners;
 }
 
@@ -128,9 +128,10 @@ std::string greetingOf(const std::vector<http::Listener>& listeners, bool withHi
 }
 
 std::string pageOf(const std::vector<http::Listener>& listeners) {
-  std::string text = "This is zorvacimd " ZORVA_VERSION
-                     ", a CIM server: it publishes the DNS client configuration of this host.\n"
-                     "Programs ask it by CIM-XML over HTTP POST (DSP0200), which a browser does not speak. These do:\n\n";
+  std::string text =
+      "This is zorvacimd " ZORVA_VERSION
+      ", a CIM server: it publishes the DNS client configuration of this host.\n"
+      "Programs ask it by CIM-XML over HTTP POST (DSP0200), which a browser does not speak. These do:\n\n";
   for (const std::string& each : commandsFor(listeners)) text += "  " + each + "\n";
   return text;
 }
