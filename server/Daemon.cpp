@@ -192,7 +192,8 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
 
 void Daemon::greet() const {
   const bool isTerminal = ::isatty(STDOUT_FILENO) == 1;
-  if (!commandLine_.greet && !isTerminal && config_.port != 0) return;
+  const bool hasOwnPort = config_.port == 0 || (certificate_.exists() && config_.tlsPort == 0);
+  if (!commandLine_.greet && !isTerminal && !hasOwnPort) return;
   const bool hasHints = commandLine_.greet || isTerminal;
   std::string text = greetingOf(listeners_, hasHints);
   if (hasHints && config_.access.anonymous == access::Role::Read) {

@@ -68,7 +68,7 @@ std::vector<std::string> commandsFor(const http::Listener& listener) {
   if (listener.door == http::Door::Http) {
     return {"wbemcli ein " + url + kClass, "zorvactl --url " + url + "/root/cimv2 show"};
   }
-  return {"wbemcli ein -noverify " + withLogin(url, "USER:PASSWORD") + kClass,
+  return {"wbemcli ein -cacert server.crt " + withLogin(url, "USER:PASSWORD") + kClass,
           "zorvactl --url " + withLogin(url, "USER") + "/root/cimv2 show"};
 }
 
