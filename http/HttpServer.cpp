@@ -195,24 +195,23 @@ MHD_Daemon* HttpServer::Core::startDaemon(Door door) const {
   constexpr unsigned kMostConnections = 1U << 20;
   // Strings are compared by the header's rules for each: strict where leniency would let requests be smuggled.
   constexpr int kStrict = 1;
-  MHD_OptionItem tls[] = {
-      {MHD_OPTION_HTTPS_PRIORITIES, 0, const_cast<char*>(kTlsPriorities)},
-      {MHD_OPTION_HTTPS_CERT_CALLBACK2, 0, reinterpret_cast<void*>(&noCertificate)},
-      {MHD_OPTION_END, 0, nullptr}};
+  MHD_OptionItem tls[] = {{MHD_OPTION_HTTPS_PRIORITIES, 0, const_cast<char*>(kTlsPriorities)},
+                          {MHD_OPTION_HTTPS_CERT_CALLBACK2, 0, reinterpret_cast<void*>(&noCertificate)},
+                          {MHD_OPTION_END, 0, nullptr}};
   const bool isTls = door == Door::Https;
   auto* self = const_cast<Core*>(this);
-  MHD_Daemon* daemon = MHD_start_daemon(                                                        //
-      kFlags | (isTls ? kTlsFlags : kPlainFlags),                             //
-      0, nullptr, nullptr, &Core::onRequest, self,                                              //
-      MHD_OPTION_EXTERNAL_LOGGER, &Core::onLog, self,                                           //
-      MHD_OPTION_THREAD_POOL_SIZE, static_cast<unsigned>(threads_),                             //
-      MHD_OPTION_CONNECTION_LIMIT, kMostConnections,                                            //
-      MHD_OPTION_CONNECTION_MEMORY_LIMIT, limits_.headerBytes,                                  //
-      MHD_OPTION_STRICT_FOR_CLIENT, kStrict,                                                    //
-      MHD_OPTION_SIGPIPE_HANDLED_BY_APP, 1,                                                     //
-      MHD_OPTION_URI_LOG_CALLBACK, &Core::onRequestLine, self,                                  //
-      MHD_OPTION_NOTIFY_COMPLETED, &Core::onCompleted, self,                                    //
-      MHD_OPTION_NOTIFY_CONNECTION, &Core::onConnection, self,                                  //
+  MHD_Daemon* daemon = MHD_start_daemon(                             //
+      kFlags | (isTls ? kTlsFlags : kPlainFlags),                    //
+      0, nullptr, nullptr, &Core::onRequest, self,                   //
+      MHD_OPTION_EXTERNAL_LOGGER, &Core::onLog, self,                //
+      MHD_OPTION_THREAD_POOL_SIZE, static_cast<unsigned>(threads_),  //
+      MHD_OPTION_CONNECTION_LIMIT, kMostConnections,                 //
+      MHD_OPTION_CONNECTION_MEMORY_LIMIT, limits_.headerBytes,       //
+      MHD_OPTION_STRICT_FOR_CLIENT, kStrict,                         //
+      MHD_OPTION_SIGPIPE_HANDLED_BY_APP, 1,                          //
+      MHD_OPTION_URI_LOG_CALLBACK, &Core::onRequestLine, self,       //
+      MHD_OPTION_NOTIFY_COMPLETED, &Core::onCompleted, self,         //
+      MHD_OPTION_NOTIFY_CONNECTION, &Core::onConnection, self,       //
       MHD_OPTION_ARRAY, isTls ? tls : tls + std::size(tls) - 1, MHD_OPTION_END);
   if (daemon == nullptr) throw std::runtime_error("the HTTP threads cannot be started");
   return daemon;

@@ -26,9 +26,7 @@ bool beginsRequest(unsigned char byte) {
   return (byte >= 'A' && byte <= 'Z') || (byte >= 'a' && byte <= 'z') || byte == '\r' || byte == '\n';
 }
 
-bool isWrong(Door door, unsigned char byte) {
-  return door == Door::Http ? byte == kTlsHandshake : beginsRequest(byte);
-}
+bool isWrong(Door door, unsigned char byte) { return door == Door::Http ? byte == kTlsHandshake : beginsRequest(byte); }
 
 std::string localAddress(int socket) {
   sockaddr_storage local{};

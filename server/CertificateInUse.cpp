@@ -39,8 +39,8 @@ void CertificateInUse::use(const http::TlsFiles& files, http::HttpServer& server
 
 void CertificateInUse::renew(const http::TlsFiles& files, http::HttpServer& server) noexcept try {
   use(files, server);
-  ZORVA_LOG(Warning, "the certificate was read again: SHA-256 fingerprint " + identity_->fingerprint() + ", good until " +
-                         dateText(identity_->validUntil()));
+  ZORVA_LOG(Warning, "the certificate was read again: SHA-256 fingerprint " + identity_->fingerprint() +
+                         ", good until " + dateText(identity_->validUntil()));
 } catch (const std::exception& error) {
   ZORVA_LOG(Error, std::string("the certificate stays as it was: ") + error.what());
 }

@@ -58,7 +58,8 @@ void readTls(Config& config, const util::TomlDocument& document) {
   if (files.certificate.empty() && !files.clientCa.empty()) tls.fail("client_ca", "needs tls.certificate and tls.key");
   if (files.certificate.empty() && config.tlsAddresses) tls.fail("addresses", "needs tls.certificate and tls.key");
   if (!files.certificate.empty() && files.key.empty()) tls.fail("certificate", "needs tls.key");
-  for (std::string* each : {&files.certificate, &files.key, &files.clientCa}) *each = util::pathFrom(config.file, *each);
+  for (std::string* each : {&files.certificate, &files.key, &files.clientCa})
+    *each = util::pathFrom(config.file, *each);
 }
 
 void readLimits(Config& config, const util::TomlDocument& document) {

@@ -197,7 +197,8 @@ void Daemon::greet() const {
   const bool hasHints = commandLine_.greet || isTerminal;
   std::string text = greetingOf(listeners_, hasHints);
   if (hasHints && config_.access.anonymous == access::Role::Read) {
-    text += "It shows everything and changes nothing; with --anonymous operate every user of this host may change it.\n";
+    text +=
+        "It shows everything and changes nothing; with --anonymous operate every user of this host may change it.\n";
   }
   std::fputs(text.c_str(), stdout);
   std::fflush(stdout);

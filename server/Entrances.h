@@ -14,8 +14,9 @@ namespace zorva::server {
 /// std::invalid_argument, with a sentence that says what is missing.
 void checkLogins(const Config& config, bool hasUsers);
 
-/// The sockets that the service manager has passed on, or those of the configuration. If HTTPS is configured and none of
-/// the sockets passed on speaks it, those of the configuration are opened beside them. Throws std::runtime_error or std::invalid_argument with a sentence.
+/// The sockets that the service manager has passed on, or those of the configuration. If HTTPS is configured and none
+/// of the sockets passed on speaks it, those of the configuration are opened beside them. Throws std::runtime_error or
+/// std::invalid_argument with a sentence.
 std::vector<http::Listener> openListeners(const Config& config, bool hasUsers);
 
 /// The line that says where the server listens. With hints also how to send it a request.

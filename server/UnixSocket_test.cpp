@@ -135,12 +135,11 @@ TEST(InheritedSockets, AreOfAllKinds) {
 TEST(InheritedSockets, WithoutHttpsLeaveItToTheConfiguration) {
   const agent::testing::TemporaryDirectory directory;
   const auto files = http::testing::TestAuthority(directory, "ca").issue("server");
-  const TestDaemon daemon(
-      "[tls]\ncertificate = \"" + files.certificate + "\"\nkey = \"" + files.key + "\"\nport = 0\n",
-      {"--log-level", "4500"}, [] {
-        handOverTcp(0, "127.0.0.1");
-        announce("1", "http");
-      });
+  const TestDaemon daemon("[tls]\ncertificate = \"" + files.certificate + "\"\nkey = \"" + files.key + "\"\nport = 0\n",
+                          {"--log-level", "4500"}, [] {
+                            handOverTcp(0, "127.0.0.1");
+                            announce("1", "http");
+                          });
   ASSERT_NE(daemon.tlsPort(), 0);
   EXPECT_THAT(outputOf("curl -sSk https://localhost:" + std::to_string(daemon.tlsPort())),
               HasSubstr("This is zorvacimd "));

@@ -23,9 +23,7 @@ TEST(ReplaceFile, ANewFileIsReadByWhoMayEnterItsDirectory) {
   }
 }
 
-TEST(ReplaceFile, ARightIsNotGivenForADirectoryThatIsNotThere) {
-  EXPECT_EQ(rightsIn("/no/such/directory"), 0600U);
-}
+TEST(ReplaceFile, ARightIsNotGivenForADirectoryThatIsNotThere) { EXPECT_EQ(rightsIn("/no/such/directory"), 0600U); }
 
 }  // namespace
 }  // namespace zorva::util
