@@ -98,7 +98,7 @@ TEST(ManyInterfaces, AGraphFollowsTheFirstObjectsAndSaysSo) {
 }
 
 TEST(ManyInterfaces, ALineSaysWhatTakesLongAndIsErased) {
-  const TestHost host(TestHost::manyInterfaces(3000));
+  const TestHost host(TestHost::manyInterfaces(1500));
   const Outcome outcome = host.run({"classes", "--all"}, OutputTo::ErrorTerminal);
   EXPECT_EQ(outcome.exitCode, 0);
   EXPECT_THAT(outcome.err, AllOf(HasSubstr("counting ZORVA_DNS"), EndsWith("\r\033[K")));
