@@ -23,7 +23,8 @@ struct AuditRecord {
   std::string operation;  ///< "ModifyInstance", "SetDNSServers"; of a request that was refused earlier, its HTTP method
   std::string object;     ///< the text of a path
   std::vector<AuditChange> changes;
-  std::string result;  ///< "done", or why not
+  std::string result;      ///< "done", or why not
+  bool isRefusal = false;  ///< the client may not do that; anybody can cause such records
 };
 
 /// Takes the records. Called on any thread; it must not wait.

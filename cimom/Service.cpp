@@ -252,6 +252,7 @@ class ServiceCore {
   void audit(access::AuditRecord record, const Status& status) const noexcept try {
     if (record.object.empty() || !options_.audit) return;
     if (!status.ok()) record.result = statusText(status);
+    record.isRefusal = status.rc == CMPI_RC_ERR_ACCESS_DENIED;
     options_.audit(std::move(record));
   } catch (...) {
     // A log that fails must not fail the request.

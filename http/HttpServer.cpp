@@ -101,6 +101,19 @@ int noCertificate(gnutls_session_t, const gnutls_cert_retr_st*, gnutls_pcert_st*
   return -1;
 }
 
+access::AuditRecord recordOf(const HttpExchange& exchange, const Refusal& refusal) {
+  const HeaderList& headers = exchange.request.headers;
+  const std::string* operation = findHeader(headers, "CIMMethod");
+  const std::string* object = findHeader(headers, "CIMObject");
+  access::AuditRecord record;
+  record.from = exchange.client->peer();
+  record.operation = operation != nullptr ? *operation : exchange.request.method;
+  record.object = object != nullptr ? *object : exchange.request.path;
+  record.result = std::to_string(refusal.status) + " " + refusal.why;
+  record.isRefusal = true;
+  return record;
+}
+
 std::string withoutLineEnd(std::string text) {
   while (!text.empty() && (text.back() == '\n' || text.back() == '\r')) text.pop_back();
   return text;
@@ -118,6 +131,7 @@ class HttpServer::Core {
   void look() { reception_.look(); }
   void setTls(std::shared_ptr<const TlsIdentity> identity);
   void setHostNames(const std::vector<std::string>& names);
+  void setAudit(access::AuditHook audit) { audit_ = std::move(audit); }
   void setLimits(const HttpLimits& limits);
   void sweep();
   bool hasWork() const;
@@ -167,6 +181,7 @@ class HttpServer::Core {
   Connections connections_;
   Workers workers_;
   LoginQueue logins_;
+  access::AuditHook audit_;
   std::atomic<std::size_t> bodies_ = 0;  ///< bytes of unfinished requests
   std::atomic<std::size_t> requests_ = 0;
   MHD_Daemon* daemon_ = nullptr;
@@ -461,12 +476,10 @@ void HttpServer::Core::awaitLogin(HttpExchange& exchange, const std::string* aut
 MHD_Result HttpServer::Core::loginIsDecided(HttpExchange& exchange, MHD_Connection* connection) {
   exchange.awaitsLogin = false;
   access::Decision decision = exchange.takeDecision();
-  // The gate itself logs a login that failed.
-  const bool isNew = decision.kind != access::Decision::Kind::NeedsLogin;
   const auto refusal = letIn(exchange, std::move(decision));
   exchange.client->enter(refusal ? Phase::Sending : Phase::Arriving);
   if (!refusal) return MHD_YES;
-  if (isNew) logRefusal(exchange, *refusal);
+  logRefusal(exchange, *refusal);
   return respondWith(connection, *refusal);
 }
 
@@ -536,6 +549,7 @@ void HttpServer::Core::onCompleted(void* self, MHD_Connection*, void** holder, M
 }
 
 void HttpServer::Core::logRefusal(const HttpExchange& exchange, const Refusal& refusal) const {
+  if (audit_ && (refusal.status == 401 || refusal.status == 403)) return audit_(recordOf(exchange, refusal));
   ZORVA_LOG_CLIENT(Warning, exchange.client->peer() + " " + exchange.request.method + " " + exchange.request.path +
                                 ": " + std::to_string(refusal.status) + " " + refusal.why);
 }
@@ -576,6 +590,8 @@ void HttpServer::look() { core_->look(); }
 void HttpServer::setTls(std::shared_ptr<const TlsIdentity> identity) { core_->setTls(std::move(identity)); }
 
 void HttpServer::setHostNames(const std::vector<std::string>& names) { core_->setHostNames(names); }
+
+void HttpServer::setAudit(access::AuditHook audit) { core_->setAudit(std::move(audit)); }
 
 void HttpServer::setLimits(const HttpLimits& limits) { core_->setLimits(limits); }
 

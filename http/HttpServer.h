@@ -13,6 +13,7 @@
 #include <string>
 #include <vector>
 
+#include "access/Audit.h"
 #include "access/Gate.h"
 #include "http/Door.h"
 #include "http/Exchange.h"
@@ -51,6 +52,10 @@ class HttpServer : util::NotCopied {
 
   /// Further names of this host that the header Host may have.
   void setHostNames(const std::vector<std::string>& names);
+
+  /// Takes a record of each request that is refused because of who its client is, which then has no line in the log.
+  /// Call it before take().
+  void setAudit(access::AuditHook audit);
 
   /// The limits for requests from now on; the size of headers does not change.
   void setLimits(const HttpLimits& limits);

@@ -34,7 +34,7 @@ std::string now() {
 }
 
 std::string missing(std::size_t count) {
-  return std::to_string(count) + " lines of the audit were left out here: they came faster than they could be written";
+  return std::to_string(count) + " lines of the audit were left out here: too many came at once";
 }
 
 void writeAll(int file, std::string_view text) {
@@ -54,9 +54,19 @@ struct AuditLog::State {
   std::condition_variable changed;
   std::deque<std::string> lines;
   std::size_t leftOut = 0;
+  std::chrono::steady_clock::time_point second{};
+  int refusals = 0;  ///< in this second
   bool ends = false;
   bool isDone = false;
   std::shared_ptr<const Writer> writer;
+
+  bool isFlood(std::chrono::steady_clock::time_point now) {
+    if (now - second >= std::chrono::seconds(1)) {
+      second = now;
+      refusals = 0;
+    }
+    return ++refusals > kMostRefusals;
+  }
 };
 
 AuditLog::AuditLog(Writer writer) : state_(std::make_shared<State>()) {
@@ -80,7 +90,7 @@ AuditLog::~AuditLog() {
 void AuditLog::take(const access::AuditRecord& record) noexcept try {
   std::string line = access::auditLine(record);
   const std::lock_guard lock(state_->mutex);
-  if (state_->lines.size() >= kMostWaiting) {
+  if (state_->lines.size() >= kMostWaiting || (record.isRefusal && state_->isFlood(std::chrono::steady_clock::now()))) {
     ++state_->leftOut;
     return;
   }

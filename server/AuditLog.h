@@ -24,14 +24,17 @@ class AuditLog : util::NotCopied {
   /// How many lines wait for the writer at most.
   static constexpr std::size_t kMostWaiting = 4096;
 
+  /// How many refusals are written in a second at most.
+  static constexpr int kMostRefusals = 50;
+
   /// Starts a thread that writes.
   explicit AuditLog(Writer writer);
 
   /// Writes what waits, and ends the thread. What is not written within two seconds is lost.
   ~AuditLog();
 
-  /// Takes a record and never waits for the disk. If too many lines wait, it is left out, and a line says how many were
-  /// left out there. Thread-safe.
+  /// Takes a record and never waits for the disk. If too many lines wait, or too many refusals come, it is left out,
+  /// and a line says how many were left out there. Thread-safe.
   void take(const access::AuditRecord& record) noexcept;
 
   /// From now on lines go there. Thread-safe.

@@ -5,6 +5,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <atomic>
 #include <future>
 #include <optional>
@@ -69,6 +70,23 @@ TEST(AuditLog, ADiskThatWaitsHoldsUpNobodyAndWhatIsLeftOutIsCounted) {
   }
   ASSERT_EQ(disk.lines.size(), AuditLog::kMostWaiting + 2);
   EXPECT_THAT(disk.lines.back(), HasSubstr("7 lines of the audit were left out here"));
+}
+
+TEST(AuditLog, ManyRefusalsInASecondAreCountedAndChangesAreNot) {
+  Disk disk;
+  disk.let.set_value();
+  {
+    AuditLog log(disk.writer());
+    access::AuditRecord refusal = record(0);
+    refusal.isRefusal = true;
+    for (int i = 0; i < 10 * AuditLog::kMostRefusals; ++i) log.take(refusal);
+    for (int i = 0; i < 100; ++i) log.take(record(1));
+  }
+  const auto isChange = [](const std::string& line) { return line.find("Op1 ") != std::string::npos; };
+  const auto isCount = [](const std::string& line) { return line.find("were left out here") != std::string::npos; };
+  EXPECT_EQ(std::count_if(disk.lines.begin(), disk.lines.end(), isChange), 100);
+  EXPECT_GE(std::count_if(disk.lines.begin(), disk.lines.end(), isCount), 1);
+  EXPECT_LT(disk.lines.size(), 100U + 3 * AuditLog::kMostRefusals) << "in two seconds at most";
 }
 
 TEST(AuditLog, ALineThatCannotBeWrittenDoesNotEndTheRest) {

@@ -187,6 +187,7 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
       },
       pageOf(listeners_), gate_);
   server_->setHostNames(config_.names);
+  server_->setAudit([this](const access::AuditRecord& record) { audit_->take(record); });
   if (!config_.tls.certificate.empty()) certificate_.use(config_.tls, *server_);
 }
 
