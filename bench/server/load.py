@@ -11,7 +11,11 @@ counts, because other work on the machine only lowers a figure. Each request ask
 
 "hostile" is how long a client waits while others send requests of 3.9 MB of one element, repeated.
 
-NAME picks the figures: few, many, start, memory, endpoints, hostile. Exits 1 if a figure misses its target.
+"tls" compares requests over HTTPS with plain HTTP, and those with a login with those without, on connections that stay
+open. "intruders" is how long a client that has logged in waits while others try passwords, or begin TLS handshakes and do
+not go on. The others run at the lowest priority, because they would have machines of their own.
+
+NAME picks the figures: few, many, start, memory, endpoints, tls, hostile, intruders. Exits 1 if a figure misses its target.
 """
 
 import argparse
@@ -29,6 +33,7 @@ import tempfile
 import time
 
 import hostile as sending
+import intruders
 
 HERE = os.path.dirname(os.path.abspath(__file__))
 THREADS = 2
@@ -124,11 +129,11 @@ def ask(port, class_name):
     return body
 
 
-def load(port, class_name, connections, seconds=SECONDS):
+def load(port, class_name, connections, seconds=SECONDS, scheme="http", login=None):
     """Requests per second, and the latencies in microseconds at which 50 and 99 of 100 requests are done."""
     output = subprocess.run(
         ["wrk", "-t1", f"-c{connections}", f"-d{seconds}s", "--latency", "-s", os.path.join(HERE, "post.lua"),
-         f"http://127.0.0.1:{port}", class_name], check=True, stdout=subprocess.PIPE, text=True).stdout
+         f"{scheme}://127.0.0.1:{port}", class_name, *([login] if login else [])], check=True, stdout=subprocess.PIPE, text=True).stdout
     wrong = re.search(r"Non-2xx.*|Socket errors.*", output)
     if wrong:
         raise RuntimeError(f"{class_name}: {wrong.group(0)}")
@@ -195,6 +200,65 @@ def threads_time(process):
     return times
 
 
+@contextlib.contextmanager
+def secure_server(build):
+    """Runs zorvacimd with a certificate and a user; gives its ports of HTTP and of HTTPS, and the user's login."""
+    with tempfile.TemporaryDirectory() as directory:
+        config = os.path.join(directory, "zorvacimd.toml")
+        with open(config, "w", encoding="utf-8") as file:
+            file.write(f'[listen]\naddresses = ["127.0.0.1"]\nport = 0\n[tls]\ncertificate = "server.crt"\nkey = "server.key"\n'
+                       f'addresses = ["127.0.0.1"]\nport = 0\n[access]\nusers = "users"\n[http]\nthreads = {THREADS}\n')
+        program = os.path.join(build, "bin", "zorvacimd")
+        subprocess.run([program, "--config", config, "--make-certificate"], check=True, stdout=subprocess.DEVNULL)
+        subprocess.run([os.path.join(build, "bin", "zorvactl"), "user", "add", "bench", "--password-stdin", "--file",
+                        os.path.join(directory, "users")], input="bench secret\n", text=True, check=True,
+                       stdout=subprocess.DEVNULL)
+        process = subprocess.Popen([program, "--config", config, "--greet", "--agent-config", free_tree(directory, 4)],
+                                   stdout=subprocess.PIPE, text=True)
+        try:
+            line = process.stdout.readline()
+            ports = {scheme: int(port) for scheme, port in re.findall(r"(https?)://127\.0\.0\.1:(\d+)", line)}
+            yield ports["http"], ports["https"], intruders.basic("bench", "bench secret")
+        finally:
+            process.terminate()
+            process.wait(timeout=30)
+
+
+def tls(build):
+    figures = []
+    class_name = "ZORVA_DNSProtocolEndPoint"
+    with secure_server(build) as (http_port, https_port, login):
+        for connections in (1, 8):
+            runs = {"plain": [], "tls": [], "login": []}
+            for _ in range(TURNS):
+                runs["plain"].append(load(http_port, class_name, connections)[0])
+                runs["tls"].append(load(https_port, class_name, connections, scheme="https")[0])
+                runs["login"].append(load(https_port, class_name, connections, scheme="https", login=login)[0])
+            best = {name: max(rates) for name, rates in runs.items()}
+            name = f"{connections} connection{'s' if connections > 1 else ''}"
+            figures.append(Figure(f"HTTPS, {name}: requests/s, to those of plain HTTP", best["tls"] / best["plain"], 0.8, True,
+                                  f"{best['tls']:.0f} / {best['plain']:.0f} a second"))
+            figures.append(Figure(f"with a login, {name}: requests/s, to those without", best["login"] / best["tls"], 0.95, True,
+                                  f"{best['login']:.0f} / {best['tls']:.0f} a second"))
+    return figures
+
+
+def waits_beside_intruders(build):
+    figures = []
+    class_name = "ZORVA_DNSProtocolEndPoint"
+    for name, attack in (("1,000 wrong logins", intruders.wrong_logins), ("300 half handshakes", intruders.half_handshakes)):
+        with secure_server(build) as (_, port, login):
+            quiet = min(load(port, class_name, 1, 2, "https", login)[2] for _ in range(3))
+            with intruders.running(attack, port) as done:
+                while not done.value:
+                    time.sleep(0.01)
+                beside = load(port, class_name, 1, 3, "https", login)[2]
+                count = done.value
+            figures.append(Figure(f"beside {name}: p99, to that without", beside / quiet, 3, False,
+                                  f"{beside:.0f} / {quiet:.0f} us, {count} of them so far"))
+    return figures
+
+
 def start_time(build):
     """From the start of the process to the end of the first answer, in milliseconds; the median."""
     times = []
@@ -258,7 +322,7 @@ def hostile(build):
 def main():
     parser = argparse.ArgumentParser(description=__doc__, formatter_class=argparse.RawDescriptionHelpFormatter)
     parser.add_argument("--build", default="build/bench", help="the build folder (default: %(default)s)")
-    parser.add_argument("names", nargs="*", metavar="NAME", help="only: few, many, endpoints, start, memory, hostile")
+    parser.add_argument("names", nargs="*", metavar="NAME", help="only: few, many, endpoints, start, memory, tls, hostile, intruders")
     arguments = parser.parse_args()
     build = os.path.abspath(arguments.build)
     parts = {
@@ -267,7 +331,9 @@ def main():
         "start": lambda: start_time(build),
         "memory": lambda: memory(build),
         "endpoints": lambda: endpoints(build),
+        "tls": lambda: tls(build),
         "hostile": lambda: hostile(build),
+        "intruders": lambda: waits_beside_intruders(build),
     }
     wanted = [name for name in arguments.names if name != "server"] or list(parts)
     if not set(wanted) <= set(parts):

@@ -1,4 +1,4 @@
--- wrk sends one request over and over: its class, operation and namespace come as arguments.
+-- wrk sends one request over and over: its class comes as the first argument, a login as the second.
 local class = "Bench_Few"
 local namespace = "root/cimv2"
 
@@ -14,6 +14,7 @@ function init(arguments)
   wrk.headers["CIMOperation"] = "MethodCall"
   wrk.headers["CIMMethod"] = "EnumerateInstances"
   wrk.headers["CIMObject"] = namespace
+  wrk.headers["Authorization"] = arguments[2]  -- nil: none
   wrk.body = '<?xml version="1.0" encoding="utf-8"?>\n<CIM CIMVERSION="2.0" DTDVERSION="2.0">'
     .. '<MESSAGE ID="1" PROTOCOLVERSION="1.0"><SIMPLEREQ><IMETHODCALL NAME="EnumerateInstances">'
     .. "<LOCALNAMESPACEPATH>" .. names .. "</LOCALNAMESPACEPATH>"
