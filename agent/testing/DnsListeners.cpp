@@ -1,7 +1,6 @@
 #include "agent/testing/DnsListeners.h"
 
 #include <arpa/inet.h>
-#include <netdb.h>
 #include <poll.h>
 #include <sys/socket.h>
 
@@ -38,10 +37,8 @@ DnsListeners::DnsListeners(const std::vector<std::string>& addresses, unsigned c
 
 void DnsListeners::lookUp(const std::string& name) {
   const pid_t child = startChild([&name] {
-    addrinfo hints{};
-    hints.ai_family = AF_INET;
-    addrinfo* found = nullptr;
-    return ::getaddrinfo(name.c_str(), nullptr, &hints, &found) != 0;
+    ::execlp("getent", "getent", "ahosts", name.c_str(), static_cast<char*>(nullptr));
+    return false;
   });
   while (::waitpid(child, nullptr, WNOHANG) == 0) answer();
 }

@@ -18,7 +18,7 @@ class DnsListeners {
   /// Listens on port 53 of these IPv4 addresses. Throws std::runtime_error where that fails.
   DnsListeners(const std::vector<std::string>& addresses, unsigned char code);
 
-  /// Looks a name up with the C library, in another process, and answers until that is done.
+  /// Looks a name up with getent, which asks the C library, and answers until that is done.
   void lookUp(const std::string& name);
 
   std::vector<std::string> asked;  ///< servers in the order in which they were asked first
