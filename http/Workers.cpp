@@ -69,6 +69,7 @@ class Workers::Core : public WaitListener, public std::enable_shared_from_this<C
   void forget(HttpExchange& exchange);
   bool sleep(std::unique_lock<std::mutex>& lock);
   void watch(std::unique_lock<std::mutex>& lock);
+  void leaveOneForTheRest();
   bool needsThread() const;
   Sleeper* nextSleeper();
   void wakeOne();
@@ -206,6 +207,16 @@ void Workers::Core::watch(std::unique_lock<std::mutex>& lock) {
   }
 }
 
+/// A thread that takes a request may hang in it. While others wait, one more thread answers or watches them.
+void Workers::Core::leaveOneForTheRest() {
+  if (queue_.empty() || isWatched_) return;
+  if (Sleeper* const next = nextSleeper()) {
+    next->release();
+  } else if (needsThread()) {
+    startThread();
+  }
+}
+
 /// Takes the locks of the exchanges, so it must not be called under this one's.
 std::ptrdiff_t Workers::Core::countHanging() const {
   const std::vector<std::shared_ptr<HttpExchange>> all = exchanges();
@@ -229,6 +240,7 @@ bool Workers::Core::answer(std::unique_lock<std::mutex>& lock) {
   const std::shared_ptr<HttpExchange> exchange = std::move(queue_.front());
   queue_.pop_front();
   ++active_;
+  leaveOneForTheRest();
   lock.unlock();
 
   Refusal otherwise{500, "the server has no answer to this request", {}};
