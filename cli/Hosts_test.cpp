@@ -240,13 +240,11 @@ TEST_F(Hosts, AreChangedAfterAYes) {
 
 TEST_F(Hosts, AreChangedIfThePersonAtTheTerminalAgrees) {
   const Words words{"domain", "eth0", "lab.example.org", "--hosts", file()};
-  std::string shown;
-  EXPECT_EQ(first_.runAsking("n\n", shown, words).exitCode, 1);
+  const Words question{"change this on 2 hosts? [y/N]: "};
+  EXPECT_EQ(first_.runAtTerminal(words, question, {"n"}).exitCode, 1);
   EXPECT_EQ(domainOf(first_), "example.org");
-  shown.clear();
-  const Outcome outcome = first_.runAsking("y\n", shown, words);
-  EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
-  EXPECT_THAT(shown, StartsWith("change this on 2 hosts? [y/N]: "));
+  const Outcome outcome = first_.runAtTerminal(words, question, {"y"});
+  EXPECT_EQ(outcome.exitCode, 0) << outcome.out;
   EXPECT_EQ(domainOf(first_), "lab.example.org");
 }
 
@@ -264,19 +262,18 @@ TEST(ManyHosts, AnswerWhileThreeFail) {
   const TestHost host;
   const TestServer server(host);
   ASSERT_NE(server.url(), "");
-  const TestCertificate authority = makeAuthority("authority of the test");
-  const std::string ca = host.directory().write("ca.pem", authority.certificate);
+  const http::testing::TestAuthority authority(host.directory(), "ca");
   const SilentServer silent("127.0.0.101");
-  const Forwarder wrong(makeCertificate({"192.0.2.1"}, &authority), server.url(), "127.0.0.102");
+  const Forwarder wrong(authority.issue("wrong", {.names = {"192.0.2.1"}}), server.url(), "127.0.0.102");
   std::list<Forwarder> good;
   std::string text = "127.0.0.100:1\n" + silent.address() + "\n" + wrong.url() + "\n";
   for (int i = 1; i <= kGood; ++i) {
     const std::string address = "127.0.0." + std::to_string(i);
-    good.emplace_back(makeCertificate({address}, &authority), server.url(), address);
+    good.emplace_back(authority.issue(address, {.names = {address}}), server.url(), address);
     text += good.back().url().substr(8) + "\n";
   }
   const std::string file = host.directory().write("hosts", text);
-  const Outcome outcome = host.run({"names", kGeneral, "--hosts", file, "--ca", ca, "--timeout", "4"});
+  const Outcome outcome = host.run({"names", kGeneral, "--hosts", file, "--ca", authority.file(), "--timeout", "4"});
   EXPECT_EQ(outcome.exitCode, 1);
   const std::vector<std::string> lines = linesOf(outcome.out);
   ASSERT_EQ(lines.size(), 1U + kGood) << outcome.err;

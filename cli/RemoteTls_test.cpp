@@ -15,13 +15,22 @@
 namespace zorva::cli {
 namespace {
 
-const TestCertificate& authority() {
-  static const TestCertificate made = makeAuthority("authority of the test");
-  return made;
+using http::testing::IssuedFiles;
+using http::testing::TestAuthority;
+
+enum class Validity { Now, Past };
+
+/// A certificate for one name or address.
+IssuedFiles certificateFor(const TestAuthority& authority, const std::string& name, Validity validity = Validity::Now) {
+  http::testing::Wanted wanted{.subject = name, .names = {name}};
+  if (validity == Validity::Past) wanted.from = -864000;
+  if (validity == Validity::Past) wanted.until = -3600;
+  static int count = 0;
+  return authority.issue("issued" + std::to_string(++count), wanted);
 }
 
-TestCertificate ofAuthority(const std::string& name, Validity validity = Validity::Now) {
-  return makeCertificate({name}, &authority(), validity);
+std::string fingerprintOf(const IssuedFiles& certificate) {
+  return http::testing::fingerprintByOpenssl(certificate.certificate);
 }
 
 const Words kNames{"names", "ZORVA_DNSSettingData"};
@@ -29,11 +38,15 @@ const Words kNames{"names", "ZORVA_DNSSettingData"};
 /// A host whose server is reached over TLS. Its authority is trusted only by --ca.
 class RemoteTls : public testing::Test {
  protected:
-  RemoteTls() { host_.directory().write("ca.pem", authority().certificate); }
-
   void SetUp() override { ASSERT_NE(server_.url(), "") << "the server did not start"; }
 
-  std::string ca() const { return host_.directory() / "ca.pem"; }
+  std::string ca() const { return authority_.file(); }
+
+  IssuedFiles ofAuthority(const std::string& name, Validity validity = Validity::Now) const {
+    return certificateFor(authority_, name, validity);
+  }
+  /// Of an authority that nobody trusts.
+  IssuedFiles ofOther(const std::string& name) const { return certificateFor(other_, name); }
 
   Outcome run(const Forwarder& tls, Words words) const {
     words.insert(words.end(), {"--url", tls.url()});
@@ -41,7 +54,7 @@ class RemoteTls : public testing::Test {
     return host_.run(words);
   }
 
-  void expectTrusted(const TestCertificate& certificate, const Words& words) const {
+  void expectTrusted(const IssuedFiles& certificate, const Words& words) const {
     const Forwarder tls(certificate, server_.url());
     const Outcome outcome = run(tls, words);
     EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
@@ -50,33 +63,34 @@ class RemoteTls : public testing::Test {
   }
 
   /// Checks that the certificate is shown with the reason, and nothing is sent to the server that has it.
-  void expectUntrusted(const TestCertificate& certificate, const Words& words, const std::string& told) const {
+  void expectUntrusted(const IssuedFiles& certificate, const Words& words, const std::string& told) const {
     const Forwarder tls(certificate, server_.url());
     const Outcome outcome = run(tls, words);
     EXPECT_EQ(outcome.exitCode, 1);
     EXPECT_EQ(outcome.out, "");
     EXPECT_THAT(outcome.err, AllOf(StartsWith("zorvactl: the certificate of " + tls.url() + " is not "),
                                    HasSubstr("nothing was sent"), HasSubstr(told),
-                                   HasSubstr("SHA-256: " + certificate.fingerprint), HasSubstr("subject: CN"),
+                                   HasSubstr("SHA-256: " + fingerprintOf(certificate)), HasSubstr("subject: CN"),
                                    HasSubstr("valid:   from "), HasSubstr("zorvacimd --make-certificate")));
     EXPECT_EQ(tls.received(), "");
   }
 
   TestHost host_;
   TestServer server_{host_};
+  TestAuthority authority_{host_.directory(), "ca"};
+  TestAuthority other_{host_.directory(), "other"};
 };
 
 TEST_F(RemoteTls, TrustsTheGivenAuthority) { expectTrusted(ofAuthority("127.0.0.1"), {"--ca", ca()}); }
 
 TEST_F(RemoteTls, RefusesAnAuthorityThatTheSystemDoesNotTrust) {
-  const TestCertificate certificate = ofAuthority("127.0.0.1");
-  expectUntrusted(certificate, {}, "--fingerprint " + certificate.fingerprint);
-  expectUntrusted(makeCertificate({"127.0.0.1"}), {}, "--ca FILE");
+  const IssuedFiles certificate = ofAuthority("127.0.0.1");
+  expectUntrusted(certificate, {}, "--fingerprint " + fingerprintOf(certificate));
+  expectUntrusted(ofOther("127.0.0.1"), {}, "--ca FILE");
 }
 
 TEST_F(RemoteTls, RefusesAnotherAuthorityThanTheGivenOne) {
-  const std::string other = host_.directory().write("other.pem", makeAuthority("another").certificate);
-  expectUntrusted(ofAuthority("127.0.0.1"), {"--ca", other}, "--fingerprint ");
+  expectUntrusted(ofAuthority("127.0.0.1"), {"--ca", other_.file()}, "--fingerprint ");
 }
 
 TEST_F(RemoteTls, RefusesACertificateThatHasExpired) {
@@ -89,35 +103,34 @@ TEST_F(RemoteTls, RefusesACertificateForAnotherHost) {
 }
 
 TEST_F(RemoteTls, TrustsTheCertificateWithTheFingerprintWhateverElseItSays) {
-  for (const TestCertificate& certificate :
-       {makeCertificate({"127.0.0.1"}), ofAuthority("192.0.2.1", Validity::Past)}) {
+  for (const IssuedFiles& certificate : {ofOther("127.0.0.1"), ofAuthority("192.0.2.1", Validity::Past)}) {
     std::string spelled = "SHA256:";
-    for (std::size_t i = 0; i < 64; i += 2) spelled += certificate.fingerprint.substr(i, 2) + (i < 62 ? ":" : "");
-    expectTrusted(certificate, {"--fingerprint", certificate.fingerprint});
+    for (std::size_t i = 0; i < 64; i += 2) spelled += fingerprintOf(certificate).substr(i, 2) + (i < 62 ? ":" : "");
+    expectTrusted(certificate, {"--fingerprint", fingerprintOf(certificate)});
     expectTrusted(certificate, {"--fingerprint", spelled});
   }
 }
 
 TEST_F(RemoteTls, SendsNothingToACertificateWithAnotherFingerprint) {
   // A trusted authority and the right name do not help.
-  expectUntrusted(ofAuthority("127.0.0.1"), {"--fingerprint", makeCertificate({"127.0.0.1"}).fingerprint},
+  expectUntrusted(ofAuthority("127.0.0.1"), {"--fingerprint", fingerprintOf(ofOther("127.0.0.1"))},
                   "is not the one with this fingerprint");
 }
 
 TEST_F(RemoteTls, ChecksTheFingerprintOnceForManyRequests) {
-  const TestCertificate certificate = makeCertificate({"127.0.0.1"});
+  const IssuedFiles certificate = ofOther("127.0.0.1");
   const Forwarder tls(certificate, server_.url());
-  const Outcome outcome = host_.run({"show", "--url", tls.url(), "--fingerprint", certificate.fingerprint});
+  const Outcome outcome = host_.run({"show", "--url", tls.url(), "--fingerprint", fingerprintOf(certificate)});
   EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
   EXPECT_EQ(tls.connections(), 1U);
 }
 
 TEST_F(RemoteTls, ChecksTheFingerprintOfEachConnection) {
   // Each request has a connection of its own, because the server closes it.
-  const TestCertificate certificate = makeCertificate({"127.0.0.1"});
+  const IssuedFiles certificate = ofOther("127.0.0.1");
   const ScriptedServer scripted([](const std::string&) { return ScriptedServer::cimReply("<IRETURNVALUE/>"); });
   const Forwarder tls(certificate, scripted.url());
-  const Outcome outcome = host_.run({"show", "--url", tls.url(), "--fingerprint", certificate.fingerprint});
+  const Outcome outcome = host_.run({"show", "--url", tls.url(), "--fingerprint", fingerprintOf(certificate)});
   EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
   EXPECT_GT(tls.connections(), 1U);
 }
@@ -142,21 +155,21 @@ class RemoteTlsOfGnuTls : public RemoteTls {
 };
 
 TEST_F(RemoteTlsOfGnuTls, ChecksTheSame) {
-  const TestCertificate certificate = ofAuthority("127.0.0.1");
-  const TestCertificate expired = ofAuthority("127.0.0.1", Validity::Past);
-  const TestCertificate other = ofAuthority("host1.example.org");
+  const IssuedFiles certificate = ofAuthority("127.0.0.1");
+  const IssuedFiles expired = ofAuthority("127.0.0.1", Validity::Past);
+  const IssuedFiles other = ofAuthority("host1.example.org");
   const Forwarder good(certificate, server_.url());
   const Forwarder old(expired, server_.url());
   const Forwarder named(other, server_.url());
   EXPECT_EQ(runSo(good, {"--ca", ca()}).exitCode, 0);
-  EXPECT_EQ(runSo(named, {"--fingerprint", other.fingerprint}).exitCode, 0);
-  EXPECT_EQ(runSo(old, {"--fingerprint", expired.fingerprint}).exitCode, 0);
+  EXPECT_EQ(runSo(named, {"--fingerprint", fingerprintOf(other)}).exitCode, 0);
+  EXPECT_EQ(runSo(old, {"--fingerprint", fingerprintOf(expired)}).exitCode, 0);
   const std::string before = named.received() + old.received();
   for (const auto& [tls, words, shown] : std::vector<std::tuple<const Forwarder*, Words, std::string>>{
-           {&old, {"--ca", ca()}, expired.fingerprint},
-           {&named, {"--ca", ca()}, other.fingerprint},
-           {&old, {}, expired.fingerprint},
-           {&named, {"--fingerprint", certificate.fingerprint}, other.fingerprint}}) {
+           {&old, {"--ca", ca()}, fingerprintOf(expired)},
+           {&named, {"--ca", ca()}, fingerprintOf(other)},
+           {&old, {}, fingerprintOf(expired)},
+           {&named, {"--fingerprint", fingerprintOf(certificate)}, fingerprintOf(other)}}) {
     const Outcome outcome = runSo(*tls, words);
     EXPECT_EQ(outcome.exitCode, 1);
     EXPECT_THAT(outcome.err, AllOf(HasSubstr("nothing was sent"), HasSubstr("SHA-256: " + shown),
@@ -166,7 +179,7 @@ TEST_F(RemoteTlsOfGnuTls, ChecksTheSame) {
 }
 
 TEST_F(RemoteTls, ReportsFilesAndFingerprintsThatAreNone) {
-  const Forwarder tls(makeCertificate({"127.0.0.1"}), server_.url());
+  const Forwarder tls(ofOther("127.0.0.1"), server_.url());
   const std::string text = host_.directory().write("text.pem", "hello\n");
   for (const auto& [words, told] : std::vector<std::pair<Words, std::string>>{
            {{"--ca", "/nowhere/ca.pem"}, "--ca /nowhere/ca.pem: No such file or directory"},
@@ -208,7 +221,7 @@ class RemoteLogin : public testing::Test {
   }
 
   Words words(const Words& more, const std::string& user = "user") const {
-    Words all{"--url", user.empty() ? tls_.url() : tls_.urlOf(user), "--fingerprint", certificate_.fingerprint};
+    Words all{"--url", user.empty() ? tls_.url() : tls_.urlOf(user), "--fingerprint", fingerprintOf(certificate_)};
     all.insert(all.end(), more.begin(), more.end());
     all.insert(all.end(), kNames.begin(), kNames.end());
     return all;
@@ -228,7 +241,8 @@ class RemoteLogin : public testing::Test {
   }
 
   TestHost host_;
-  TestCertificate certificate_ = makeCertificate({"127.0.0.1"});
+  TestAuthority authority_{host_.directory(), "ca"};
+  IssuedFiles certificate_ = certificateFor(authority_, "127.0.0.1");
   ScriptedServer scripted_{answer};
   Forwarder tls_{certificate_, scripted_.url()};
 };
@@ -246,9 +260,10 @@ TEST_F(RemoteLogin, TakesThePasswordOfStandardInput) {
 }
 
 TEST_F(RemoteLogin, AsksForThePasswordAtTheTerminalAndDoesNotShowIt) {
-  std::string shown;
-  expectLoggedIn(host_.runAsking("pass word\n", shown, words({})));
-  EXPECT_EQ(shown, "password of user@127.0.0.1: \r\n");
+  const Outcome outcome = host_.runAtTerminal(words({}), {"password of user@127.0.0.1: "}, {"pass word"});
+  EXPECT_EQ(outcome.exitCode, 0);
+  EXPECT_EQ(outcome.out, "password of user@127.0.0.1: \r\n");
+  EXPECT_THAT(scripted_.requests(), testing::Contains(HasSubstr(kLogin)));
 }
 
 TEST_F(RemoteLogin, NeedsAPasswordFromSomewhere) {
@@ -388,6 +403,83 @@ TEST_F(Unprivileged, AsksTheServerForSettingsThatItMayNotRead) {
   EXPECT_THAT(outcome.err, AllOf(HasSubstr("note: this user may not read "), HasSubstr(" is asked\n")));
   outcome = run(words, "/nowhere/cim.sock", 0700);
   EXPECT_THAT(outcome.err, HasSubstr("the settings that are stored there are not shown\n"));
+}
+
+// --- the server of this project
+
+/// zorvacimd with TLS, a socket, and the users alice, who operates, and bob, who reads.
+class RemoteServer : public testing::Test {
+ protected:
+  RemoteServer() {
+    host_.directory().write("data/ifcfg-eth0", kWholeFile);
+    for (const auto& [name, role] : {std::pair{"alice", "operate"}, std::pair{"bob", "read"}}) {
+      const Outcome added = host_.runWithInput(
+          "pass word\n", {"user", "add", name, "--role", role, "--file", host_.directory() / "users"});
+      EXPECT_EQ(added.exitCode, 0) << added.err;
+    }
+    const IssuedFiles certificate = certificateFor(authority_, "127.0.0.1");
+    server_ = std::make_unique<TestServer>(host_, "[listen]\nsocket = \"" + socket() + "\"\n[tls]\nport = 0\n" +
+                                                      "certificate = \"" + certificate.certificate + "\"\nkey = \"" +
+                                                      certificate.key + "\"\n[access]\nanonymous = \"none\"\n" +
+                                                      "users = \"" + (host_.directory() / "users") + "\"\n");
+    password_ = host_.directory().write("password", "pass word\n");
+    ::chmod(password_.c_str(), 0600);
+  }
+
+  void SetUp() override { ASSERT_NE(server_->tlsUrl(), "") << "the server did not start"; }
+
+  std::string socket() const { return host_.directory() / "cim.sock"; }
+
+  Outcome runAs(const std::string& user, Words words) const {
+    const Words more{"--url", server_->tlsUrlOf(user), "--ca", authority_.file(), "--password-file", password_};
+    words.insert(words.end(), more.begin(), more.end());
+    return host_.run(words);
+  }
+
+  TestHost host_;
+  TestAuthority authority_{host_.directory(), "ca"};
+  std::unique_ptr<TestServer> server_;
+  std::string password_;
+};
+
+TEST_F(RemoteServer, LetsAnOperatorChangeAndAReaderRead) {
+  EXPECT_EQ(runAs("bob", kNames).out, host_.run(kNames).out);
+  Outcome outcome = runAs("bob", {"domain", "eth0", "lab.example.org"});
+  EXPECT_EQ(outcome.exitCode, 1);
+  EXPECT_THAT(outcome.err, AllOf(HasSubstr("CIM_ERR_ACCESS_DENIED (2): "),
+                                 HasSubstr("'zorvactl user role', run on that host, gives the user the role operate")));
+  outcome = runAs("alice", {"domain", "eth0", "lab.example.org"});
+  EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
+  EXPECT_THAT(contentsOf(host_.dataFile("ifcfg-eth0")), HasSubstr("DOMAINNAME=lab.example.org\n"));
+}
+
+TEST_F(RemoteServer, RefusesOtherLogins) {
+  EXPECT_THAT(runAs("nobody", kNames).err, HasSubstr(" refused the login of nobody"));
+  host_.directory().write("password", "wrong\n");
+  const Outcome outcome = runAs("alice", kNames);
+  EXPECT_EQ(outcome.exitCode, 1);
+  EXPECT_THAT(outcome.err, HasSubstr(" refused the login of alice"));
+  EXPECT_THAT(host_.run({"names", kGeneral, "--url", server_->tlsUrl(), "--ca", authority_.file()}).err,
+              HasSubstr(" asks for a login"));
+}
+
+TEST_F(RemoteServer, KnowsLocalUsersAtItsSocket) {
+  if (::geteuid() != 0) GTEST_SKIP() << "only root may change settings there";
+  const std::string url = "unix:" + socket();
+  const Outcome changed = host_.run({"domain", "eth0", "lab.example.org", "--url", url});
+  EXPECT_EQ(changed.exitCode, 0) << changed.err;
+  const Outcome denied = host_.runUnprivileged({"domain", "eth0", "other.example.org", "--url", url});
+  if (denied.exitCode == 127) GTEST_SKIP() << "another user cannot run what was built here";
+  EXPECT_EQ(denied.exitCode, 1);
+  EXPECT_THAT(denied.err, AllOf(HasSubstr("CIM_ERR_ACCESS_DENIED (2): "),
+                                HasSubstr("root and the members of the group zorva may change settings there")));
+  EXPECT_EQ(host_.runUnprivileged({"names", kGeneral, "--url", url}).exitCode, 0);
+}
+
+TEST_F(RemoteServer, SaysThatThePortIsOneForHttps) {
+  const Outcome outcome = host_.run({"names", kGeneral, "--url", "http://" + server_->tlsUrl().substr(8)});
+  EXPECT_EQ(outcome.exitCode, 1);
+  EXPECT_THAT(outcome.err, HasSubstr("https"));
 }
 
 }  // namespace

@@ -1,8 +1,6 @@
 // zorvactl user, as a process on a file of its own.
 
-#include <pty.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -165,38 +163,15 @@ TEST_F(UserCommands, WithoutTheRightsItSaysWhatToDo) {
 
 TEST_F(UserCommands, ItIsAboutThisHost) { expectFailed({"list", "--url", "http://127.0.0.1:1"}, 2, "leave out --url"); }
 
-/// zorvactl at a terminal, where a person types the answers to the questions.
-std::string atTerminal(const Words& words, const Words& questions, const Words& answers) {
-  int master = -1;
-  const pid_t child = ::forkpty(&master, nullptr, nullptr, nullptr);
-  if (child == 0) {
-    std::vector<char*> arguments{const_cast<char*>("zorvactl")};
-    for (const std::string& word : words) arguments.push_back(const_cast<char*>(word.c_str()));
-    arguments.push_back(nullptr);
-    ::execv(ZORVA_BIN_DIR "/zorvactl", arguments.data());
-    ::_exit(127);
-  }
-  std::string shown;
-  std::size_t next = 0;
-  char buffer[256];
-  for (ssize_t count = 0; (count = ::read(master, buffer, sizeof buffer)) > 0;) {
-    shown.append(buffer, static_cast<std::size_t>(count));
-    if (next == questions.size() || !shown.ends_with(questions[next])) continue;
-    const std::string answer = answers[next++] + "\n";
-    EXPECT_EQ(::write(master, answer.data(), answer.size()), static_cast<ssize_t>(answer.size()));
-  }
-  ::close(master);
-  ::waitpid(child, nullptr, 0);
-  return shown;
-}
-
 TEST_F(UserCommands, AtATerminalThePasswordIsAskedForTwiceAndNotShown) {
   const Words questions{"Password of alice: ", "The same again: "};
-  const std::string shown = atTerminal(with({"add", "alice"}), questions, {"correct horse", "correct horse"});
+  const std::string shown =
+      host_.runAtTerminal(with({"add", "alice"}), questions, {"correct horse", "correct horse"}).out;
   EXPECT_THAT(shown, AllOf(HasSubstr("added alice: read"), Not(HasSubstr("correct"))));
   EXPECT_TRUE(access::isPasswordOf("correct horse", user("alice").hash));
-  EXPECT_THAT(atTerminal(with({"add", "bob"}), {"Password of bob: ", "The same again: "}, {"correct horse", "correct"}),
-              HasSubstr("the two passwords differ"));
+  const Outcome outcome = host_.runAtTerminal(with({"add", "bob"}), {"Password of bob: ", "The same again: "},
+                                              {"correct horse", "correct"});
+  EXPECT_THAT(outcome.out, HasSubstr("the two passwords differ"));
   EXPECT_EQ(access::readUsersFile(file()).find("bob"), nullptr);
 }
 

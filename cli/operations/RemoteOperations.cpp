@@ -54,7 +54,9 @@ void requireSuccess(const ServerUrl& server, const HttpReply& reply) {
     throw Failure(ExitCode::Failed, server.shown() + " refuses this client" + (why.empty() ? "" : ": " + why));
   }
   const std::string who = server.shown() + " answered HTTP " + std::to_string(reply.status);
-  throw Failure(ExitCode::Failed, who + fieldOf(reply, "CIMError"), "is that a CIM server (CIM-XML over HTTP)?");
+  const std::string why = sentenceOf(reply);
+  throw Failure(ExitCode::Failed, who + (why.empty() ? fieldOf(reply, "CIMError") : ": " + why),
+                "is that a CIM server (CIM-XML over HTTP)?");
 }
 
 /// A failure after the response had begun is reported in trailers (DSP0200 6.2).

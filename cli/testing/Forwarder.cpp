@@ -100,25 +100,14 @@ bool pass(End& from, End& to, std::string* seen, std::mutex& mutex) {
 
 }  // namespace
 
-struct Forwarder::Credentials : util::NotCopied {
-  explicit Credentials(const TestCertificate& certificate) {
-    const auto datumOf = [](const std::string& text) {
-      return gnutls_datum_t{reinterpret_cast<unsigned char*>(const_cast<char*>(text.data())),
-                            static_cast<unsigned>(text.size())};
-    };
-    const gnutls_datum_t pem = datumOf(certificate.certificate);
-    const gnutls_datum_t key = datumOf(certificate.key);
-    gnutls_certificate_allocate_credentials(&all);
-    if (gnutls_certificate_set_x509_key_mem(all, &pem, &key, GNUTLS_X509_FMT_PEM) < 0) {
-      throw std::runtime_error("no certificate");
-    }
-  }
-  ~Credentials() { gnutls_certificate_free_credentials(all); }
-  gnutls_certificate_credentials_t all = nullptr;
-};
-
-Forwarder::Forwarder(const TestCertificate& certificate, const std::string& target, const std::string& address)
-    : target_(target), url_(address), credentials_(std::make_unique<Credentials>(certificate)) {
+Forwarder::Forwarder(const http::testing::IssuedFiles& certificate, const std::string& target,
+                     const std::string& address)
+    : target_(target), url_(address) {
+  gnutls_certificate_credentials_t credentials = nullptr;
+  http::checkGnutls(gnutls_certificate_allocate_credentials(&credentials));
+  credentials_.reset(credentials);
+  http::checkGnutls(gnutls_certificate_set_x509_key_file(credentials, certificate.certificate.c_str(),
+                                                         certificate.key.c_str(), GNUTLS_X509_FMT_PEM));
   listener_ = listenOnLoopback(url_);
   url_ = "https://" + url_;
   thread_ = std::thread([this] { serve(); });
@@ -172,7 +161,7 @@ void Forwarder::forward(int client) {
   if (credentials_ == nullptr) {
     near = std::make_unique<End>(client);
   } else {
-    auto tls = std::make_unique<TlsEnd>(client, credentials_->all);
+    auto tls = std::make_unique<TlsEnd>(client, credentials_.get());
     isReady = tls->shakeHands();
     near = std::move(tls);
   }

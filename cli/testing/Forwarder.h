@@ -2,15 +2,14 @@
 
 // For tests of --url: ways to a server that speaks plain HTTP on loopback: TLS, and a Unix socket.
 
-#include <gnutls/gnutls.h>
-
 #include <list>
 #include <memory>
 #include <mutex>
 #include <string>
 #include <thread>
 
-#include "cli/testing/TestAuthority.h"
+#include "http/GnutlsHandles.h"
+#include "http/testing/TestCertificates.h"
 #include "util/FileDescriptor.h"
 #include "util/NotCopied.h"
 
@@ -20,7 +19,8 @@ namespace zorva::cli {
 class Forwarder : util::NotCopied {
  public:
   /// A TLS server with this certificate, on a port of its own at this loopback address.
-  Forwarder(const TestCertificate& certificate, const std::string& target, const std::string& address = "127.0.0.1");
+  Forwarder(const http::testing::IssuedFiles& certificate, const std::string& target,
+            const std::string& address = "127.0.0.1");
 
   /// A Unix socket of that path.
   Forwarder(const std::string& socket, const std::string& target);
@@ -37,14 +37,13 @@ class Forwarder : util::NotCopied {
   std::size_t connections() const;
 
  private:
-  struct Credentials;
   void serve();
   void forward(int client);
 
   util::FileDescriptor listener_;
   std::string target_;
   std::string url_;
-  std::unique_ptr<Credentials> credentials_;  ///< null: no TLS
+  http::TlsCredentials credentials_;  ///< null: no TLS
   mutable std::mutex mutex_;
   std::string received_;
   std::list<int> open_;

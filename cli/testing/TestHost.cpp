@@ -2,6 +2,7 @@
 
 #include <fcntl.h>
 #include <poll.h>
+#include <pty.h>
 #include <sched.h>
 #include <signal.h>
 #include <stdlib.h>
@@ -15,7 +16,6 @@
 #include <array>
 #include <filesystem>
 #include <stdexcept>
-#include <thread>
 
 #include "cli/output/Text.h"
 
@@ -184,31 +184,27 @@ Outcome TestHost::runWithInput(const std::string& input, const std::vector<std::
   return outcome;
 }
 
-Outcome TestHost::runAsking(const std::string& typed, std::string& shown, const std::vector<std::string>& words) const {
-  const Pair terminal = makeTerminal();
-  std::thread person([&] {
-    char buffer[256];
-    bool hasTyped = false;
-    for (;;) {
-      const ssize_t count = ::read(terminal.reader, buffer, sizeof buffer);
-      if (count <= 0) return;
-      shown.append(buffer, static_cast<std::size_t>(count));
-      if (!hasTyped && shown.ends_with(": ")) hasTyped = ::write(terminal.reader, typed.data(), typed.size()) > 0;
-      if (shown.ends_with("\004")) return;
-    }
-  });
-  Outcome outcome = runPrepared(
-      [&] {
-        return ::setsid() >= 0 && ::ioctl(terminal.writer, TIOCSCTTY, 0) == 0 &&
-               ::dup2(terminal.writer, STDIN_FILENO) >= 0;
-      },
-      {}, words, OutputTo::Pipe);
-  // The end of the terminal's text, for the reader: the terminal itself stays open here.
-  (void)!::write(terminal.writer, "\004", 1);
-  person.join();
-  shown.pop_back();
-  ::close(terminal.writer);
-  ::close(terminal.reader);
+Outcome TestHost::runAtTerminal(const std::vector<std::string>& words, const std::vector<std::string>& questions,
+                                const std::vector<std::string>& answers) const {
+  int master = -1;
+  const pid_t child = ::forkpty(&master, nullptr, nullptr, nullptr);
+  if (child < 0) throw std::runtime_error("no terminal");
+  if (child == 0) {
+    ::setenv("ZORVAGENT_CONFIG", (directory_ / "agent.toml").c_str(), 1);
+    ::setenv("TERM", "dumb", 1);
+    become(words, STDOUT_FILENO, STDERR_FILENO);
+  }
+  Outcome outcome;
+  std::size_t next = 0;
+  char buffer[256];
+  for (ssize_t count = 0; (count = ::read(master, buffer, sizeof buffer)) > 0;) {
+    outcome.out.append(buffer, static_cast<std::size_t>(count));
+    if (next == questions.size() || !outcome.out.ends_with(questions[next])) continue;
+    const std::string answer = answers[next++] + "\n";
+    if (::write(master, answer.data(), answer.size()) < 0) throw std::runtime_error("nothing can be typed");
+  }
+  ::close(master);
+  outcome.exitCode = exitCodeOf(child);
   return outcome;
 }
 

@@ -43,8 +43,10 @@ class TestHost {
   /// program.
   Outcome runUnprivileged(const std::vector<std::string>& words, unsigned mode = 0755) const;
 
-  /// Runs it at a terminal, at which `typed` is typed when it asks something. `shown` gets what the terminal showed.
-  Outcome runAsking(const std::string& typed, std::string& shown, const std::vector<std::string>& words) const;
+  /// Runs it at a terminal of its own, where a person types the answers when the questions are shown. `out` is what the
+  /// terminal shows.
+  Outcome runAtTerminal(const std::vector<std::string>& words, const std::vector<std::string>& questions,
+                        const std::vector<std::string>& answers) const;
 
   /// The effect of writing more than a file may hold.
   enum class AtLimit { WriteFails, IsKilled };

@@ -59,8 +59,8 @@ void sendAll(int connection, std::string_view text) {
 
 }  // namespace
 
-TestServer::TestServer(const TestHost& host) {
-  const std::string config = host.directory().write("zorvacimd.toml", "");
+TestServer::TestServer(const TestHost& host, const std::string& text) {
+  const std::string config = host.directory().write("zorvacimd.toml", text);
   const std::string agent = host.directory() / "agent.toml";
   int ends[2];
   if (::pipe2(ends, O_CLOEXEC) != 0) throw std::runtime_error("no pipe");
@@ -69,14 +69,18 @@ TestServer::TestServer(const TestHost& host) {
     ::prctl(PR_SET_PDEATHSIG, SIGTERM);
     ::dup2(ends[1], STDOUT_FILENO);
     ::execl(ZORVA_BIN_DIR "/zorvacimd", "zorvacimd", "--config", config.c_str(), "--agent-config", agent.c_str(),
-            "--listen", "127.0.0.1", "--port", "0", "--log-level", "9999", "--anonymous", "operate", nullptr);
+            "--listen", "127.0.0.1", "--port", "0", "--log-level", "9999", nullptr);
     ::_exit(127);
   }
   ::close(ends[1]);
   const std::string line = firstLine(ends[0]);
   ::close(ends[0]);
-  const std::size_t from = line.find("http://");
-  if (from != std::string::npos) url_ = line.substr(from, line.find_first_of(" \n", from) - from);
+  const auto urlOf = [&line](const char* scheme) {
+    const std::size_t from = line.find(scheme);
+    return from == std::string::npos ? std::string() : line.substr(from, line.find_first_of(" \n", from) - from);
+  };
+  url_ = urlOf("http://");
+  tlsUrl_ = urlOf("https://");
 }
 
 TestServer::~TestServer() {

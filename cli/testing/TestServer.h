@@ -20,15 +20,21 @@ class TestHost;
 /// zorvacimd, which serves a test host on its own port while this object lives.
 class TestServer : util::NotCopied {
  public:
-  explicit TestServer(const TestHost& host);
+  /// With this configuration; without one, everybody on this host may change settings.
+  explicit TestServer(const TestHost& host, const std::string& config = "[access]\nanonymous = \"operate\"\n");
   ~TestServer();
 
   /// "http://127.0.0.1:40000"; empty if it did not start.
   const std::string& url() const { return url_; }
 
+  /// "https://127.0.0.1:40000", or with that user; empty if the configuration has no certificate.
+  const std::string& tlsUrl() const { return tlsUrl_; }
+  std::string tlsUrlOf(const std::string& user) const { return "https://" + user + "@" + tlsUrl_.substr(8); }
+
  private:
   pid_t process_ = -1;
   std::string url_;
+  std::string tlsUrl_;
 };
 
 /// A server that sends what a test says. Each connection takes one request.

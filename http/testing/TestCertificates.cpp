@@ -1,5 +1,6 @@
 #include "http/testing/TestCertificates.h"
 
+#include <arpa/inet.h>
 #include <sys/stat.h>
 
 #include <algorithm>
@@ -39,8 +40,13 @@ IssuedFiles TestAuthority::issue(const std::string& name, const Wanted& wanted) 
   const X509Key key = newKey();
   const X509Certificate certificate = certificateFor(wanted, key, 2);
   for (const std::string& each : wanted.names) {
-    checkGnutls(gnutls_x509_crt_set_subject_alt_name(certificate.get(), GNUTLS_SAN_DNSNAME, each.data(),
-                                                     static_cast<unsigned int>(each.size()), GNUTLS_FSAN_APPEND));
+    in_addr address{};
+    const bool isAddress = ::inet_pton(AF_INET, each.c_str(), &address) == 1;
+    const void* bytes = isAddress ? static_cast<const void*>(&address) : each.data();
+    const std::size_t size = isAddress ? sizeof address : each.size();
+    checkGnutls(gnutls_x509_crt_set_subject_alt_name(certificate.get(),
+                                                     isAddress ? GNUTLS_SAN_IPADDRESS : GNUTLS_SAN_DNSNAME, bytes,
+                                                     static_cast<unsigned int>(size), GNUTLS_FSAN_APPEND));
   }
   const char* purpose = wanted.forClient ? GNUTLS_KP_TLS_WWW_CLIENT : GNUTLS_KP_TLS_WWW_SERVER;
   checkGnutls(gnutls_x509_crt_set_key_purpose_oid(certificate.get(), purpose, 0));

@@ -12,8 +12,8 @@
 namespace zorva::http::testing {
 
 struct Wanted {
-  std::string subject = "localhost";  ///< the common name
-  std::vector<std::string> names = {"localhost"};
+  std::string subject = "localhost";               ///< the common name
+  std::vector<std::string> names = {"localhost"};  ///< or IPv4 addresses
   bool forClient = false;
   std::time_t from = -3600;    ///< seconds from now
   std::time_t until = 864000;  ///< seconds from now
