@@ -30,9 +30,11 @@ Decision comeAgain(std::string why) {
 }
 
 void lowerPriority() {
-  constexpr int kLowest = 19;
+  // A tenth of the share of a thread that answers: less would let a busy host starve a login.
+  constexpr int kNicer = 10;
   ::pthread_setname_np(::pthread_self(), "login");
-  ::setpriority(PRIO_PROCESS, 0, kLowest);  // on Linux, of this thread alone; where it may not be, hashing competes
+  // On Linux, of this thread alone. Where it may not be, hashing competes.
+  ::setpriority(PRIO_PROCESS, 0, ::getpriority(PRIO_PROCESS, 0) + kNicer);
 }
 
 }  // namespace

@@ -1,6 +1,6 @@
 #pragma once
 
-// Logins whose check takes long: one thread checks them, at the lowest priority, so that hashing does not compete with
+// Logins whose check takes long: one thread checks them, at a low priority, so that hashing does not compete with
 // the requests of clients that are known.
 //
 // The clients take turns, so a client with a thousand wrong logins does not delay another one's first. The answer to a

@@ -97,7 +97,7 @@ void writeJson(const std::vector<HostOutcome>& outcomes) {
     Json document = Json::parse(outcome.text, nullptr, false);
     if (document.is_discarded()) continue;
     if (!document.is_array()) document = Json::array({std::move(document)});
-    for (Json& result : document) rows.push_back({{"host", outcome.label}, {"result", std::move(result)}});
+    for (Json& result : document) rows.push_back({{"host", asUtf8(outcome.label)}, {"result", std::move(result)}});
   }
   write(rows.dump(2) + "\n");
 }
