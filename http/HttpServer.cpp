@@ -336,7 +336,7 @@ void HttpServer::Core::onConnection(void* self, MHD_Connection* connection, void
   if (code == MHD_CONNECTION_NOTIFY_STARTED) {
     const int socket = MHD_get_connection_info(connection, MHD_CONNECTION_INFO_CONNECTION_FD)->connect_fd;
     *own = new OpenConnection{core.connections_.find(socket), nullptr, false, false, {}};
-    if (const gnutls_session_t session = sessionOf(connection); session != nullptr) {
+    if (gnutls_session_t session = sessionOf(connection); session != nullptr) {
       (*own)->tls = core.shared(core.tls_);
       (*own)->tls->attach(session);
       gnutls_session_set_ptr(session, *own);

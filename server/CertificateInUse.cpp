@@ -9,7 +9,7 @@ namespace zorva::server {
 
 namespace {
 
-constexpr std::time_t kDay = 24 * 60 * 60;
+constexpr std::time_t kDay = std::time_t{24} * 60 * 60;
 constexpr int kDaysBefore = 30;
 
 }  // namespace
