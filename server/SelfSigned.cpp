@@ -26,8 +26,8 @@ namespace {
 
 using http::checkGnutls;
 
-constexpr std::time_t kHour = 60 * 60;
-constexpr std::time_t kYear = 365 * 24 * kHour;
+constexpr std::time_t kHour = std::time_t{60} * 60;
+constexpr std::time_t kYear = std::time_t{365} * 24 * kHour;
 
 void addName(gnutls_x509_crt_t certificate, const std::string& name) {
   unsigned char bytes[sizeof(in6_addr)];
