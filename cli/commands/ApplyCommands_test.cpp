@@ -1,6 +1,7 @@
 // zorvactl apply, confirm and revert, and changes that reach the host at once, on private hosts with real owners.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <sys/mount.h>
 
 #include <filesystem>
 
@@ -257,6 +258,21 @@ bool survivesTheRestartOfItsOwner(const Owner& owner) {
   return true;
 }
 
+/// Where the memory of the old state cannot be written, no owner is touched.
+bool changesNothingOnAReadOnlyFileSystem(const Owner& owner) {
+  const OwnedHost host(owner, "overlay");
+  EXPECT_THAT(run("dns set eth0 192.0.2.53"), EndsWith("[0]\n"));
+  constexpr const char* kData = "/var/lib/zorvagent";
+  EXPECT_EQ(::mount(kData, kData, nullptr, MS_BIND, nullptr), 0);
+  EXPECT_EQ(::mount(nullptr, kData, nullptr, MS_BIND | MS_REMOUNT | MS_RDONLY, nullptr), 0);
+  EXPECT_THAT(run("apply eth0"), AllOf(HasSubstr("Read-only file system"), EndsWith("[1]\n")));
+  EXPECT_TRUE(host.hasOld()) << host.shown();
+  EXPECT_EQ(::umount(kData), 0);
+  EXPECT_THAT(run("apply eth0"), EndsWith("[0]\n"));
+  EXPECT_TRUE(host.hasNew()) << host.shown();
+  return true;
+}
+
 bool isUsedByTheCLibrary(const Owner& owner) {
   const OwnedHost host(owner, "overlay");
   Interfaces interfaces;
@@ -346,6 +362,8 @@ TEST_F(ApplyToHost, BringsEachChangeToTheHostBeforeTheCommandEnds) {
 TEST_F(ApplyToHost, BringsAChangeToItsOwner) { expectOfEachOwner(reachesItsOwner); }
 
 TEST_F(ApplyToHost, IsUsedByTheCLibrary) { expectOfEachOwner(isUsedByTheCLibrary); }
+
+TEST_F(ApplyToHost, TouchesNoOwnerOnAReadOnlyFileSystem) { expectOfEachOwner(changesNothingOnAReadOnlyFileSystem); }
 
 TEST_F(ApplyToHost, CanBeTriedAtEachOwner) { expectOfEachOwner(isTriedAtItsOwner); }
 
