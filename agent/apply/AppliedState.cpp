@@ -122,6 +122,15 @@ JsonValue objectOf(const AppliedMemory& memory) {
   return object;
 }
 
+/// The server, which is not root, reads there what became of its changes. It is of the group of the data directory.
+void shareWithGroupOf(const std::string& dataDir, const std::string& applied, const struct stat& now) {
+  struct stat data {};
+  if (::stat(dataDir.c_str(), &data) != 0 || data.st_gid == now.st_gid) return;
+  if (::lchown(applied.c_str(), static_cast<uid_t>(-1), data.st_gid) != 0 && ::geteuid() == 0) {
+    ZORVAGENT_LOG_ERROR(applied + ": its group cannot be set: " + util::fileErrorText(errno));
+  }
+}
+
 }  // namespace
 
 const SavedDns* AppliedMemory::find(const std::string& interface, const std::string& owner,
@@ -139,9 +148,13 @@ std::string appliedDirectory(const std::string& dataDir) {
   }
   struct stat status {};
   // Without the slash at its end, a link is not followed.
-  if (::lstat(path.substr(0, path.size() - 1).c_str(), &status) != 0) util::throwFileError(path, "cannot be looked at");
+  const std::string directory = path.substr(0, path.size() - 1);
+  if (::lstat(directory.c_str(), &status) != 0) util::throwFileError(path, "cannot be looked at");
   const bool isOwn = S_ISDIR(status.st_mode) && (status.st_uid == 0 || status.st_uid == ::geteuid());
-  if (isOwn && (status.st_mode & (S_IWGRP | S_IWOTH)) == 0) return path;
+  if (isOwn && (status.st_mode & (S_IWGRP | S_IWOTH)) == 0) {
+    shareWithGroupOf(dataDir, directory, status);
+    return path;
+  }
   throw std::runtime_error(path + ": is no directory that only its owner, root, may write to; remove it");
 }
 

@@ -273,19 +273,19 @@ TEST(Automatically, NothingIsAppliedThatWasTakenBack) {
   }));
 }
 
-TEST(StateOfWhatIsApplied, LiesWhereOnlyRootWrites) {
+TEST(StateOfWhatIsApplied, LiesWhereOnlyRootWritesAndTheServersGroupReads) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
   EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
-    outputOf("chown 65534 /var/lib/zorvagent; mkdir /etc/elsewhere; ln -s /etc/elsewhere /var/lib/zorvagent/applied");
+    outputOf("chown 65534:65533 /var/lib/zorvagent; mkdir /etc/elsewhere; ln -s /etc/elsewhere /var/lib/zorvagent/applied");
     EXPECT_THAT(problemOf([&] { host.apply(); }), HasSubstr("applied/: is no directory that only its owner, root"));
     outputOf("rm /var/lib/zorvagent/applied; mkdir /var/lib/zorvagent/applied; chown 65534 /var/lib/zorvagent/applied");
     EXPECT_THAT(problemOf([&] { host.apply(); }), HasSubstr("applied/: is no directory that only its owner, root"));
     EXPECT_EQ(contentsOf(kFile), kBefore);
     outputOf("rmdir /var/lib/zorvagent/applied");
     host.apply();
-    EXPECT_EQ(outputOf("stat -c %u%A /var/lib/zorvagent/applied /var/lib/zorvagent/applied/state.json"),
-              "0drwxr-xr-x\n0-rw-r--r--\n");
+    EXPECT_EQ(outputOf("stat -c %u:%g%A /var/lib/zorvagent/applied /var/lib/zorvagent/applied/state.json"),
+              "0:65533drwxr-xr-x\n0:65533-rw-r--r--\n");
   }));
 }
 
