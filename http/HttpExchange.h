@@ -69,6 +69,9 @@ class HttpExchange final : public ResponseSink, public std::enable_shared_from_t
   /// Passes the response to the HTTP library.
   MHD_Result respond();
 
+  /// After respond(): whether the head of the response is followed by all of its body at once.
+  bool hasWholeBody() const noexcept { return bytesSent_ > 0 && request.method != MHD_HTTP_METHOD_HEAD; }
+
   /// The HTTP library is done with the request. A worker that still runs gets ClientGone.
   void ended();
 

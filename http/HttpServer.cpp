@@ -23,6 +23,7 @@
 #include "http/Connections.h"
 #include "http/HostNames.h"
 #include "http/HttpExchange.h"
+#include "http/JoinedRecords.h"
 #include "http/Log.h"
 #include "http/LoginQueue.h"
 #include "http/Reception.h"
@@ -64,10 +65,11 @@ using Holder = std::shared_ptr<HttpExchange>;
 /// What the HTTP library stores for a connection.
 struct OpenConnection {
   std::shared_ptr<Connection> client;
-  std::shared_ptr<const TlsIdentity> tls;  ///< null: no TLS
-  bool isSecured = false;                  ///< the handshake of TLS is complete
-  bool isIdentified = false;               ///< its certificate was looked at
-  std::string refusal;                     ///< what is wrong with the client's certificate
+  std::shared_ptr<const TlsIdentity> tls;       ///< null: no TLS
+  bool isSecured = false;                       ///< the handshake of TLS is complete
+  bool isIdentified = false;                    ///< its certificate was looked at
+  std::string refusal = {};                     ///< what is wrong with the client's certificate
+  std::unique_ptr<JoinedRecords> records = {};  ///< null: no TLS
 };
 
 OpenConnection& openConnectionOf(MHD_Connection* connection) {
@@ -162,7 +164,8 @@ class HttpServer::Core {
   void readBody(HttpExchange& exchange, std::string_view data);
   void releaseBody(HttpExchange& exchange);
   bool answersAtOnce(HttpExchange& exchange) const;
-  MHD_Result requestIsWhole(const Holder& exchange);
+  MHD_Result requestIsWhole(const Holder& exchange, MHD_Connection* connection);
+  static MHD_Result respond(HttpExchange& exchange, MHD_Connection* connection);
   void logRefusal(const HttpExchange& exchange, const Refusal& refusal) const;
   void logAnswer(const HttpExchange& exchange) const;
   MHD_Daemon* startDaemon(Door door) const;
@@ -335,10 +338,12 @@ void HttpServer::Core::onConnection(void* self, MHD_Connection* connection, void
   auto** own = reinterpret_cast<OpenConnection**>(context);
   if (code == MHD_CONNECTION_NOTIFY_STARTED) {
     const int socket = MHD_get_connection_info(connection, MHD_CONNECTION_INFO_CONNECTION_FD)->connect_fd;
-    *own = new OpenConnection{core.connections_.find(socket), nullptr, false, false, {}};
+    *own = new OpenConnection{core.connections_.find(socket), nullptr};
     if (gnutls_session_t session = sessionOf(connection); session != nullptr) {
       (*own)->tls = core.shared(core.tls_);
       (*own)->tls->attach(session);
+      (*own)->records = std::make_unique<JoinedRecords>(socket);
+      (*own)->records->attach(session);
       gnutls_session_set_ptr(session, *own);
       gnutls_handshake_set_hook_function(session, GNUTLS_HANDSHAKE_FINISHED, GNUTLS_HOOK_POST, &onHandshakeFinished);
     }
@@ -370,8 +375,8 @@ MHD_Result HttpServer::Core::onRequest(void* self, MHD_Connection* connection, c
     *size = 0;
     return MHD_YES;
   }
-  if (exchange->isPublished()) return exchange->respond();
-  return core.requestIsWhole(exchange);
+  if (exchange->isPublished()) return respond(*exchange, connection);
+  return core.requestIsWhole(exchange, connection);
 }
 
 MHD_Result HttpServer::Core::readHead(Holder& exchange, MHD_Connection* connection, const char* method,
@@ -519,9 +524,9 @@ bool HttpServer::Core::answersAtOnce(HttpExchange& exchange) const {
   return true;
 }
 
-MHD_Result HttpServer::Core::requestIsWhole(const Holder& exchange) {
+MHD_Result HttpServer::Core::requestIsWhole(const Holder& exchange, MHD_Connection* connection) {
   releaseBody(*exchange);
-  if (answersAtOnce(*exchange)) return exchange->respond();
+  if (answersAtOnce(*exchange)) return respond(*exchange, connection);
   exchange->client->enter(Phase::Working);
   exchange->suspend();
   if (!exchange->refusal.has_value()) exchange->refusal = workers_.submit(exchange, connections_);
@@ -530,6 +535,13 @@ MHD_Result HttpServer::Core::requestIsWhole(const Holder& exchange) {
     exchange->finish(*exchange->refusal);
   }
   return MHD_YES;
+}
+
+MHD_Result HttpServer::Core::respond(HttpExchange& exchange, MHD_Connection* connection) {
+  const MHD_Result queued = exchange.respond();
+  JoinedRecords* records = openConnectionOf(connection).records.get();
+  if (records != nullptr && queued == MHD_YES && exchange.hasWholeBody()) records->joinNextTwo();
+  return queued;
 }
 
 void HttpServer::Core::onCompleted(void* self, MHD_Connection*, void** holder, MHD_RequestTerminationCode code) {

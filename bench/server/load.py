@@ -248,7 +248,8 @@ def tls(build):
 def waits_beside_intruders(build):
     figures = []
     class_name = "ZORVA_DNSProtocolEndPoint"
-    for name, attack in (("1,000 wrong logins", intruders.wrong_logins), ("300 half handshakes", intruders.half_handshakes)):
+    for name, attack in (("1,000 wrong logins", intruders.wrong_logins),
+                         ("300 half handshakes", intruders.half_handshakes)):
         with secure_server(build) as (_, port, login):
             def wait():
                 return statistics.median(load(port, class_name, 1, 2, "https", login)[2] for _ in range(3))
