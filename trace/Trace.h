@@ -4,9 +4,14 @@
 
 #include <ZALogger.h>
 
-#include <cstdio>
+#include <algorithm>
+#include <charconv>
+#include <cstddef>
 #include <cstring>
+#include <iterator>
+#include <limits>
 #include <string>
+#include <string_view>
 #include <tuple>
 #include <type_traits>
 
@@ -27,20 +32,61 @@ enum LogLevel : int {
 /// A longer line is truncated.
 constexpr std::size_t kMessageBufferSize = 512;
 
+/// Composes a line in a buffer of that size. The line always has its end; what is too long for it is left out.
+class LineWriter {
+ public:
+  explicit LineWriter(char (&buffer)[kMessageBufferSize]) : at_(buffer), end_(buffer + kMessageBufferSize - 1) {
+    std::memset(buffer, 0, sizeof buffer);
+  }
+
+  template <typename... Pieces>
+  void write(const Pieces&... pieces) {
+    (append(pieces), ...);
+  }
+
+ private:
+  void append(std::string_view text) {
+    const std::size_t size = std::min(text.size(), static_cast<std::size_t>(end_ - at_));
+    std::memcpy(at_, text.data(), size);
+    at_ += size;
+  }
+  /// A literal: its size is known when it is compiled.
+  template <std::size_t Size>
+  void append(const char (&text)[Size]) {
+    if (static_cast<std::size_t>(end_ - at_) < Size - 1) return append(std::string_view(text, Size - 1));
+    std::memcpy(at_, text, Size - 1);
+    at_ += Size - 1;
+  }
+
+  void append(const char* const& text) {
+    append(text == nullptr ? std::string_view("(null)") : std::string_view(text));
+  }
+
+  /// Signed, because the lines show a number so. A number that does not fit is cut off like a text.
+  void append(unsigned int number) {
+    char digits[std::numeric_limits<int>::digits10 + 2];
+    const auto end = std::to_chars(std::begin(digits), std::end(digits), static_cast<int>(number)).ptr;
+    append(std::string_view(std::begin(digits), static_cast<std::size_t>(end - digits)));
+  }
+
+  char* at_;
+  char* const end_;
+};
+
 // The four formatters. Each returns its own buffer, one for each thread. A line is valid until the same formatter runs
 // again on its thread. Null text prints as "(null)".
 
 inline const char* trace(const char* text, const char* file, unsigned int line, MessageType type) {
   static thread_local char messageBuffer[kMessageBufferSize];
-  std::memset(messageBuffer, 0, sizeof messageBuffer);
+  LineWriter writer(messageBuffer);
   if (type == MSG_METHOD) {
-    std::snprintf(messageBuffer, sizeof messageBuffer, "METHOD: %s() was invoked in %s [Line: %d]", text, file, line);
+    writer.write("METHOD: ", text, "() was invoked in ", file, " [Line: ", line, "]");
   } else if (type == MSG_MESSAGE) {
-    std::snprintf(messageBuffer, sizeof messageBuffer, "MESSAGE [File: %s, Line: %d]: %s", file, line, text);
+    writer.write("MESSAGE [File: ", file, ", Line: ", line, "]: ", text);
   } else if (type == MSG_EXITING) {
-    std::snprintf(messageBuffer, sizeof messageBuffer, "EXITING: %s() in %s [Line: %d]", text, file, line);
+    writer.write("EXITING: ", text, "() in ", file, " [Line: ", line, "]");
   } else {
-    std::snprintf(messageBuffer, sizeof messageBuffer, "ENTERING: %s() in %s [Line: %d]", text, file, line);
+    writer.write("ENTERING: ", text, "() in ", file, " [Line: ", line, "]");
   }
   return messageBuffer;
 }
@@ -48,36 +94,29 @@ inline const char* trace(const char* text, const char* file, unsigned int line, 
 inline const char* tracepara(const char* text, const char* file, unsigned int line, const char* parameters,
                              MessageType type) {
   static thread_local char messageBuffer[kMessageBufferSize];
-  std::memset(messageBuffer, 0, sizeof messageBuffer);
+  constexpr char kParameters[] = ",Parameters List: ";
+  LineWriter writer(messageBuffer);
   if (type == MSG_METHOD) {
-    std::snprintf(messageBuffer, sizeof messageBuffer, "METHOD: %s() was invoked in %s [Line: %d],Parameters List: %s",
-                  text, file, line, parameters);
+    writer.write("METHOD: ", text, "() was invoked in ", file, " [Line: ", line, "]", kParameters, parameters);
   } else if (type == MSG_MESSAGE) {
-    std::snprintf(messageBuffer, sizeof messageBuffer, "MESSAGE [File: %s, Line: %d]: %s,Parameters List: %s", file,
-                  line, text, parameters);
+    writer.write("MESSAGE [File: ", file, ", Line: ", line, "]: ", text, kParameters, parameters);
   } else if (type == MSG_EXITING) {
-    std::snprintf(messageBuffer, sizeof messageBuffer, "EXITING: %s() in %s [Line: %d],Parameters List: %s", text, file,
-                  line, parameters);
+    writer.write("EXITING: ", text, "() in ", file, " [Line: ", line, "]", kParameters, parameters);
   } else {
-    std::snprintf(messageBuffer, sizeof messageBuffer, "ENTERING: %s() in %s [Line: %d],Parameters List: %s", text,
-                  file, line, parameters);
+    writer.write("ENTERING: ", text, "() in ", file, " [Line: ", line, "]", kParameters, parameters);
   }
   return messageBuffer;
 }
 
 inline const char* trace(const char* name, const char* file, unsigned int line, unsigned int value) {
   static thread_local char messageBuffer[kMessageBufferSize];
-  std::memset(messageBuffer, 0, sizeof messageBuffer);
-  std::snprintf(messageBuffer, sizeof messageBuffer, "VARIABLE: '%s' has Value '%d' at line %d in %s", name, value,
-                line, file);
+  LineWriter(messageBuffer).write("VARIABLE: '", name, "' has Value '", value, "' at line ", line, " in ", file);
   return messageBuffer;
 }
 
 inline const char* trace(const char* name, const char* file, unsigned int line, const char* value) {
   static thread_local char messageBuffer[kMessageBufferSize];
-  std::memset(messageBuffer, 0, sizeof messageBuffer);
-  std::snprintf(messageBuffer, sizeof messageBuffer, "VARIABLE: '%s' has Value '%s' at line %d in %s", name, value,
-                line, file);
+  LineWriter(messageBuffer).write("VARIABLE: '", name, "' has Value '", value, "' at line ", line, " in ", file);
   return messageBuffer;
 }
 

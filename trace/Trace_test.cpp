@@ -2,6 +2,8 @@
 
 #include <cmpift.h>
 
+#include <cstdio>
+#include <iterator>
 #include <map>
 #include <thread>
 #include <vector>
@@ -93,6 +95,35 @@ TEST(TraceForms, LineIsCutAt511Characters) {
   EXPECT_EQ(511U, std::strlen(tracepara("walk", "a.cpp", 1, longText.c_str(), MSG_EXITING)));
   EXPECT_EQ(511U, std::strlen(trace("name", "a.cpp", 1, longText.c_str())));
   EXPECT_EQ(511U, std::strlen(trace(longText.c_str(), "a.cpp", 1, 1U)));
+}
+
+/// What printf makes of it in as many bytes.
+template <typename... Values>
+std::string printed(const char* format, Values... values) {
+  char line[kMessageBufferSize];
+  std::snprintf(line, sizeof line, format, values...);
+  return line;
+}
+
+TEST(TraceForms, AreWhatPrintfMakesOfThemAtEachLengthOfATextAndForEachNumber) {
+  const unsigned numbers[] = {0, 7, 0x7fffffff, 0x80000000, 0xffffffff};
+  for (std::size_t length = 0; length <= 520; ++length) {
+    const std::string text(length, 'x');
+    const char* const t = text.c_str();
+    const unsigned line = numbers[length % std::size(numbers)];
+    ASSERT_EQ(printed("METHOD: %s() was invoked in %s [Line: %d]", t, "a.cpp", line),
+              trace(t, "a.cpp", line, MSG_METHOD));
+    ASSERT_EQ(printed("MESSAGE [File: %s, Line: %d]: %s", t, line, "text"), trace("text", t, line, MSG_MESSAGE));
+    ASSERT_EQ(printed("EXITING: %s() in %s [Line: %d]", "walk", t, line), trace("walk", t, line, MSG_EXITING));
+    ASSERT_EQ(printed("ENTERING: %s() in %s [Line: %d],Parameters List: %s", t, t, line, "p"),
+              tracepara(t, t, line, "p", MSG_ENTERING));
+    ASSERT_EQ(printed("MESSAGE [File: %s, Line: %d]: %s,Parameters List: %s", "a.cpp", line, t, t),
+              tracepara(t, "a.cpp", line, t, MSG_MESSAGE));
+    ASSERT_EQ(printed("VARIABLE: '%s' has Value '%d' at line %d in %s", t, line, line, "a.cpp"),
+              trace(t, "a.cpp", line, line));
+    ASSERT_EQ(printed("VARIABLE: '%s' has Value '%s' at line %d in %s", t, t, line, "a.cpp"),
+              trace(t, "a.cpp", line, t));
+  }
 }
 
 TEST(TraceForms, ThreadsDoNotWriteIntoEachOthersLines) {

@@ -2,7 +2,6 @@
 
 // The agent's logger and the buffer in which a line is composed.
 
-#include <memory>
 #include <ostream>
 #include <string>
 
@@ -37,7 +36,10 @@ class ZORVA_AGENT_API ZAMessageBuffer {
   /// Appends text; null appends nothing. Returns this buffer.
   ZAMessageBuffer& operator<<(const char* text);
 
-  /// The stream that appends to this buffer, for values other than text. Made at its first use.
+  /// Appends an address as the stream's const void* inserter does: "0x7ffd5c10", null as "0".
+  ZAMessageBuffer& appendAddress(const void* address);
+
+  /// The stream that appends to this buffer, for values other than text and addresses.
   operator std::ostream&();
 
   /// The text gathered so far. The argument, this buffer or its stream, only makes it possible to compose and take a
@@ -46,17 +48,17 @@ class ZORVA_AGENT_API ZAMessageBuffer {
   const std::string& str(std::ostream& stream);
 
  private:
-  struct Stream;
-  std::string text_;
-  std::unique_ptr<Stream> stream_;
+  class Room;
+  class Shelf;
+  static Shelf& shelf();
+
+  Room* const room_;  ///< what the text lies in; others use it afterwards
 };
 
-/// Appends the address in the pointer, in the format of the stream's const void* inserter; never the object that it
-/// points at.
+/// Appends the address in the pointer; never the object that it points at.
 template <typename T>
 ZAMessageBuffer& operator<<(ZAMessageBuffer& buffer, T* pointer) {
-  static_cast<std::ostream&>(buffer) << static_cast<const void*>(pointer);
-  return buffer;
+  return buffer.appendAddress(pointer);
 }
 
 }  // namespace ZALog

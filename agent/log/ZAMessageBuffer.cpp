@@ -1,4 +1,12 @@
+#include <array>
+#include <atomic>
+#include <charconv>
+#include <cstdint>
+#include <iterator>
+#include <locale>
+#include <optional>
 #include <streambuf>
+#include <utility>
 
 #include "agent/interface/ZALogger.h"
 
@@ -25,37 +33,124 @@ class StringAppender : public std::streambuf {
   std::string& text_;
 };
 
-// Enough for most lines, so that a line of several pieces needs one allocation.
-constexpr std::size_t kFirstRoom = 256;
-
-}  // namespace
-
-struct ZAMessageBuffer::Stream {
+struct Stream {
   explicit Stream(std::string& text) : appender(text), stream(&appender) {}
 
   StringAppender appender;
   std::ostream stream;
 };
 
-ZAMessageBuffer::ZAMessageBuffer() = default;
+// A room does not keep more than this between two lines.
+constexpr std::size_t kKeptText = 4096;
 
-ZAMessageBuffer::~ZAMessageBuffer() = default;
+bool isAsNew(const std::ostream& stream) {
+  return stream.flags() == (std::ios_base::skipws | std::ios_base::dec) && stream.width() == 0 &&
+         stream.precision() == 6 && stream.fill() == ' ' && stream.good() &&
+         stream.exceptions() == std::ios_base::goodbit && stream.tie() == nullptr;
+}
+
+}  // namespace
+
+// What a buffer needs. The next buffer uses it again, so that a line allocates nothing.
+class ZAMessageBuffer::Room {
+ public:
+  std::ostream& stream() {
+    if (!isStreaming_ && stream_ && stream_->stream.getloc() != std::locale()) stream_.reset();
+    if (!stream_) stream_.emplace(text);
+    isStreaming_ = true;
+    return stream_->stream;
+  }
+
+  // Whether the stream would write an address in digits alone: another locale may group them.
+  bool writesPlainDigits() {
+    if (!isPlain_.has_value()) isPlain_ = std::locale() == std::locale::classic();
+    return *isPlain_;
+  }
+
+  void clear() {
+    isPlain_.reset();
+    if (std::exchange(isStreaming_, false) && !isAsNew(stream_->stream)) stream_.reset();
+    text.clear();
+    if (text.capacity() > kKeptText) text.shrink_to_fit();
+  }
+
+  std::string text;
+
+ private:
+  std::optional<Stream> stream_;
+  bool isStreaming_ = false;  // in the present line
+  std::optional<bool> isPlain_;
+};
+
+// Rooms that nobody uses. A thread has two places of its own, or shares them with few: while it composes a line it
+// often composes a part of it in a second buffer.
+class ZAMessageBuffer::Shelf {
+ public:
+  ~Shelf() {
+    for (auto& place : places_) delete place.exchange(nullptr);
+  }
+
+  Room* take() {
+    Thread& mine = thread();
+    Room* room = place(mine, mine.buffers++).exchange(nullptr, std::memory_order_acquire);
+    return room != nullptr ? room : new Room;
+  }
+
+  void giveBack(Room* room) {
+    Thread& mine = thread();
+    room->clear();
+    delete place(mine, --mine.buffers).exchange(room, std::memory_order_acq_rel);
+  }
+
+ private:
+  // Trivial, so that the library can be unloaded while the thread goes on.
+  struct Thread {
+    unsigned firstPlace;
+    unsigned buffers;
+  };
+
+  Thread& thread() {
+    static thread_local Thread mine{kPlaces, 0};
+    if (mine.firstPlace == kPlaces) mine.firstPlace = 2 * threads_.fetch_add(1, std::memory_order_relaxed) % kPlaces;
+    return mine;
+  }
+
+  std::atomic<Room*>& place(const Thread& thread, unsigned buffers) { return places_[thread.firstPlace + buffers % 2]; }
+
+  static constexpr unsigned kPlaces = 64;
+  std::atomic<unsigned> threads_ = 0;
+  std::array<std::atomic<Room*>, kPlaces> places_{};
+};
+
+ZAMessageBuffer::Shelf& ZAMessageBuffer::shelf() {
+  static Shelf shelf;
+  return shelf;
+}
+
+ZAMessageBuffer::ZAMessageBuffer() : room_(shelf().take()) {}
+
+ZAMessageBuffer::~ZAMessageBuffer() { shelf().giveBack(room_); }
 
 ZAMessageBuffer& ZAMessageBuffer::operator<<(const char* text) {
-  if (text != nullptr) text_.append(text);
+  if (text != nullptr) room_->text.append(text);
   return *this;
 }
 
-ZAMessageBuffer::operator std::ostream&() {
-  if (stream_ == nullptr) {
-    text_.reserve(kFirstRoom);
-    stream_ = std::make_unique<Stream>(text_);
+ZAMessageBuffer& ZAMessageBuffer::appendAddress(const void* address) {
+  if (address == nullptr || !room_->writesPlainDigits()) {
+    room_->stream() << address;
+    return *this;
   }
-  return stream_->stream;
+  char digits[2 + 2 * sizeof address] = {'0', 'x'};
+  const auto end = std::to_chars(digits + 2, std::end(digits), reinterpret_cast<std::uintptr_t>(address), 16).ptr;
+  room_->text.append(digits, static_cast<std::size_t>(end - digits));
+  return *this;
 }
 
-const std::string& ZAMessageBuffer::str(ZAMessageBuffer&) { return text_; }
+ZAMessageBuffer::operator std::ostream&() { return room_->stream(); }
 
-const std::string& ZAMessageBuffer::str(std::ostream&) { return text_; }
+const std::string& ZAMessageBuffer::str(ZAMessageBuffer&) { return room_->text; }
+
+const std::string& ZAMessageBuffer::str(std::ostream&) { return room_->text; }
 
 }  // namespace ZALog

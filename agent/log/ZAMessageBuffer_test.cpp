@@ -1,7 +1,12 @@
 #include <gtest/gtest.h>
 
+#include <cstdint>
+#include <iomanip>
+#include <limits>
+#include <locale>
 #include <map>
 #include <sstream>
+#include <thread>
 #include <vector>
 
 #include "agent/interface/ZALogger.h"
@@ -55,6 +60,70 @@ TEST(ZAMessageBuffer, ANullPointerIsZero) {
   ZAMessageBuffer buffer;
   buffer << static_cast<int*>(nullptr);
   EXPECT_EQ(buffer.str(buffer), "0");
+}
+
+TEST(ZAMessageBuffer, AnAddressIsWhatTheStreamWrites) {
+  for (std::uintptr_t address : {std::uintptr_t{1}, std::uintptr_t{0xabcdef}, std::uintptr_t{0x7fff12345678},
+                                 std::numeric_limits<std::uintptr_t>::max()}) {
+    const void* pointer = reinterpret_cast<const void*>(address);
+    ZAMessageBuffer buffer;
+    EXPECT_EQ(buffer.str(buffer << pointer), addressOf(pointer));
+  }
+}
+
+/// Groups the digits in threes.
+struct Grouping : std::numpunct<char> {
+  std::string do_grouping() const override { return "\3"; }
+};
+
+TEST(ZAMessageBuffer, FollowsTheLocaleOfItsTime) {
+  const void* pointer = reinterpret_cast<const void*>(std::uintptr_t{0xabcdef});
+  const auto line = [&] {
+    ZAMessageBuffer buffer;
+    static_cast<std::ostream&>(buffer) << 1234567 << ' ' << pointer << ' ';
+    return buffer.str(buffer << pointer);
+  };
+  const std::string before = line();
+  const std::locale old = std::locale::global(std::locale(std::locale::classic(), new Grouping));
+  const std::string grouped = line();
+  std::ostringstream expected;
+  expected << 1234567 << ' ' << pointer << ' ' << pointer;
+  std::locale::global(old);
+  EXPECT_EQ(grouped, expected.str());
+  EXPECT_EQ(before, "1234567 0xabcdef 0xabcdef");
+  EXPECT_EQ(line(), before);
+}
+
+TEST(ZAMessageBuffer, NothingOfABufferReachesTheNextOne) {
+  for (int i = 0; i < 3; ++i) {
+    ZAMessageBuffer buffer;
+    static_cast<std::ostream&>(buffer) << true << ' ' << 10;
+    EXPECT_EQ(buffer.str(buffer), "1 10") << i;
+    static_cast<std::ostream&>(buffer) << std::boolalpha << std::hex << std::showbase << std::setfill('.')
+                                       << std::setprecision(2);
+    static_cast<std::ostream&>(buffer) << std::setw(6) << true << 10;
+    EXPECT_EQ(buffer.str(buffer), "1 10..true0xa") << i;
+    static_cast<std::ostream&>(buffer) << std::setw(40);
+    if (i == 1) static_cast<std::ostream&>(buffer).setstate(std::ios_base::failbit);
+  }
+}
+
+TEST(ZAMessageBuffer, SeveralAreFilledAtTheSameTimeByOneThreadAndByMany) {
+  const auto compose = [](const std::string& name) {
+    for (int i = 0; i < 1000; ++i) {
+      ZAMessageBuffer outer;
+      outer << name.c_str();
+      ZAMessageBuffer inner;
+      inner << "(" << name.c_str();
+      ZAMessageBuffer innermost;
+      static_cast<std::ostream&>(innermost) << i;
+      outer << inner.str(inner << ",").c_str() << innermost.str(innermost).c_str();
+      ASSERT_EQ(outer.str(outer << ")"), name + "(" + name + "," + std::to_string(i) + ")");
+    }
+  };
+  std::vector<std::thread> threads;
+  for (int i = 0; i < 100; ++i) threads.emplace_back(compose, "thread" + std::to_string(i));
+  for (std::thread& thread : threads) thread.join();
 }
 
 TEST(ZAMessageBuffer, TakesTextOfAnyLength) {
