@@ -1,6 +1,7 @@
 #include "agent/interface/Locale.h"
 
 #include <array>
+#include <string_view>
 
 #include "agent/config/CurrentConfig.h"
 #include "agent/interface/StringConversion.h"
@@ -8,38 +9,34 @@
 namespace ZV {
 namespace {
 
+// A library's name is this prefix, its number, "_" and the language.
+constexpr std::wstring_view kPrefix = L"zorvatexts";
+
 struct Text {
-  unsigned long library;
-  const char* language;
-  const char* key;
-  const char* text;
+  std::wstring_view family;  // of libraries: the name without the language
+  std::wstring_view language;
+  std::wstring_view key;
+  std::wstring_view text;
 };
 
 // Every library has English; it replaces a language that a library lacks.
-constexpr const char* kEnglish = "en";
+constexpr std::wstring_view kEnglish = L"en";
+constexpr std::wstring_view kProfile = L"zorvatexts2_";
+static_assert(kProfile.starts_with(kPrefix));
 
 constexpr std::array kTexts{
-    Text{2, kEnglish, "MSGID_DNS_CLIENT_CAPTION", "DNS Client"},
-    Text{2, kEnglish, "MSGID_DNS_CLIENT_DESCRIPTION", "DNS client of a network interface"},
-    Text{2, kEnglish, "MSGID_DNS_SERVER_CAPTION", "DNS Server"},
-    Text{2, kEnglish, "MSGID_DNS_SERVER_DESCRIPTION", "DNS server that the system is configured to use"},
+    Text{kProfile, kEnglish, L"MSGID_DNS_CLIENT_CAPTION", L"DNS Client"},
+    Text{kProfile, kEnglish, L"MSGID_DNS_CLIENT_DESCRIPTION", L"DNS client of a network interface"},
+    Text{kProfile, kEnglish, L"MSGID_DNS_SERVER_CAPTION", L"DNS Server"},
+    Text{kProfile, kEnglish, L"MSGID_DNS_SERVER_DESCRIPTION", L"DNS server that the system is configured to use"},
 };
 
-// A library's name is the prefix, its number, "_" and the language.
-constexpr const char* kPrefix = "zorvatexts";
-
-std::string libraryName(unsigned long number, const std::string& language) {
-  return kPrefix + std::to_string(number) + '_' + language;
-}
-
-std::wstring findText(const std::string& library, const std::string& key, bool inEnglish) {
+// Null if there is none.
+const Text* findText(std::wstring_view library, std::wstring_view key, std::wstring_view language) {
   for (const Text& text : kTexts) {
-    const std::string family = libraryName(text.library, {});
-    const bool found = inEnglish ? library.starts_with(family) && std::string_view(text.language) == kEnglish
-                                 : library == family + text.language;
-    if (found && key == text.key) return make_wstring(text.text);
+    if (text.key == key && text.language == language && library.starts_with(text.family)) return &text;
   }
-  return {};
+  return nullptr;
 }
 
 }  // namespace
@@ -47,14 +44,18 @@ std::wstring findText(const std::string& library, const std::string& key, bool i
 std::string Locale::getLanguageId() { return zorva::agent::CurrentConfig::instance().get().language; }
 
 std::wstring Locale::getResourceLibrary(unsigned long number, std::string language) {
-  return make_wstring(libraryName(number, language));
+  std::wstring name(kPrefix);
+  name += std::to_wstring(number);
+  name += L'_';
+  return name += make_wstring(language);
 }
 
 std::wstring ResourceString(const std::wstring& library, const std::wstring& key) {
-  const std::string name = make_string(library);
-  const std::string wanted = make_string(key);
-  std::wstring text = findText(name, wanted, false);
-  return text.empty() ? findText(name, wanted, true) : text;
+  const std::size_t end = library.find(L'_');
+  const Text* text =
+      end == std::wstring::npos ? nullptr : findText(library, key, std::wstring_view(library).substr(end + 1));
+  if (text == nullptr) text = findText(library, key, kEnglish);
+  return text == nullptr ? std::wstring() : std::wstring(text->text);
 }
 
 }  // namespace ZV

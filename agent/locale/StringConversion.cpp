@@ -15,6 +15,10 @@ bool isByte(char32_t character) { return character >= kByteBase + 0x80 && charac
 
 bool isScalar(char32_t character) { return character <= 0x10FFFF && (character < 0xD800 || character > 0xDFFF); }
 
+constexpr char32_t kFirstBeyondAscii = 0x80;
+
+bool isAscii(char byte) { return static_cast<unsigned char>(byte) < kFirstBeyondAscii; }
+
 constexpr char32_t kReplacement = 0xFFFD;
 
 }  // namespace
@@ -23,6 +27,10 @@ std::wstring make_wstring(const std::string& text) {
   std::wstring wide;
   wide.reserve(text.size());
   for (std::size_t place = 0; place < text.size();) {
+    if (isAscii(text[place])) {
+      wide += static_cast<wchar_t>(text[place++]);
+      continue;
+    }
     const std::string_view rest = std::string_view(text).substr(place);
     const std::size_t length = zorva::util::utf8Length(rest);
     const char32_t byte = kByteBase + static_cast<unsigned char>(text[place]);
@@ -41,7 +49,9 @@ std::string make_string(const std::wstring& text) {
   narrow.reserve(text.size());
   for (const wchar_t wide : text) {
     const auto character = static_cast<char32_t>(wide);
-    if (isByte(character)) {
+    if (character < kFirstBeyondAscii) {
+      narrow += static_cast<char>(character);
+    } else if (isByte(character)) {
       narrow += static_cast<char>(static_cast<unsigned char>(character - kByteBase));
     } else {
       zorva::util::utf8Append(narrow, isScalar(character) ? character : kReplacement);
