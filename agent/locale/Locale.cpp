@@ -45,7 +45,7 @@ std::string Locale::getLanguageId() { return zorva::agent::CurrentConfig::instan
 
 std::wstring Locale::getResourceLibrary(unsigned long number, std::string language) {
   std::wstring name(kPrefix);
-  name += std::to_wstring(number);
+  name += make_wstring(std::to_string(number));
   name += L'_';
   return name += make_wstring(language);
 }
