@@ -1,7 +1,6 @@
 #include "agent/Runtime.h"
 
 #include <pthread.h>
-#include <syslog.h>
 #include <unistd.h>
 
 #include <stdexcept>
@@ -30,6 +29,11 @@ std::shared_ptr<TreeSource> makeSource(const Config& config) {
 Runtime& Runtime::instance() {
   static Runtime runtime;
   return runtime;
+}
+
+void Runtime::askForExceptions() {
+  throws_ = true;
+  neverTellSyslog();
 }
 
 // The log registers before, so that its lock is taken after these over a fork, as elsewhere.
@@ -130,12 +134,18 @@ std::shared_ptr<const TreeSnapshot> Runtime::lookForCursor() {
 
 // A server asks again with every request, so the same problem is reported once.
 void Runtime::reportOnce(const std::string& problem) {
+  // A server may fork the processes of its providers from one that has reported it.
+  if (reportedIn_ != ::getpid()) {
+    reportedIn_ = ::getpid();
+    reported_.clear();
+    syslogIsInformed_ = false;
+  }
   if (problem == reported_) return;
   reported_ = problem;
   ZORVAGENT_LOG_ERROR(problem);
   if (syslogIsInformed_) return;
   syslogIsInformed_ = true;
-  ::syslog(LOG_DAEMON | LOG_ERR, "zorvagent: %s", problem.c_str());
+  if (!errorsGoToSyslog()) tellSyslog(problem);
 }
 
 std::shared_ptr<const TreeSnapshot> Runtime::latestForCursor() {
@@ -224,7 +234,7 @@ void Runtime::reset() {
   const std::lock_guard lock(lookMutex_);
   throws_ = false;
   reported_.clear();
-  syslogIsInformed_ = false;
+  reportedIn_ = 0;
   sourceIsGiven_ = false;
   source_ = nullptr;
   CurrentConfig::instance().forget();

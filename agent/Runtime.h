@@ -40,7 +40,7 @@ class Runtime {
   /// the tree cannot be read, with a line to the log whenever the reason is a new one, and the first one to syslog.
   std::shared_ptr<const TreeSnapshot> lookForCursor();
   std::shared_ptr<const TreeSnapshot> latestForCursor();
-  void askForExceptions() { throws_ = true; }
+  void askForExceptions();
 
   /// The system's name. Throws only std::bad_alloc.
   std::string systemName();
@@ -78,6 +78,7 @@ class Runtime {
   std::shared_ptr<const TreeSnapshot> sourceTree_;  ///< null: must be read again
   bool overlayStale_ = true;
   bool latestStale_ = true;
+  pid_t reportedIn_ = 0;           ///< the process that the next two are about
   std::string reported_;           ///< the problem of the last check for a cursor; empty if there was none
   bool syslogIsInformed_ = false;  ///< syslog has the first problem
 

@@ -3,6 +3,7 @@
 #include <fcntl.h>
 #include <pthread.h>
 #include <sys/stat.h>
+#include <syslog.h>
 #include <unistd.h>
 
 #include <array>
@@ -123,7 +124,10 @@ std::string composeLine(const LogCall& call) {
 struct Stream {
   int level = kNothing;
   Logger logger;
+  bool isSyslog = false;
 };
+
+std::atomic<bool> mayTellSyslog{true};
 
 constinit std::mutex outputMutex;
 
@@ -152,6 +156,12 @@ class Output {
     writeToTarget(call);
   }
 
+  bool errorsGoToSyslog() {
+    configure();
+    const Stream& log = streamOf(LogStream::Log);
+    return sink_ == nullptr && log.isSyslog && log.level <= util::kLevelError;
+  }
+
   void setSink(LogSink* sink) {
     sink_ = sink;
     publishThresholds();
@@ -166,6 +176,7 @@ class Output {
   void setTarget(LogStream stream, const std::string& target) {
     configure();
     streamOf(stream).logger = makeLogger(target);
+    streamOf(stream).isSyslog = target == "syslog";
     publishThresholds();
   }
 
@@ -198,9 +209,11 @@ class Output {
 
   static Stream open(int level, const std::string& target) {
     try {
-      return {level, makeLogger(target)};
+      return {level, makeLogger(target), target == "syslog"};
     } catch (const std::runtime_error& error) {
-      const std::string line = std::string("zorvagent: ") + error.what() + "; its lines are lost\n";
+      const std::string problem = std::string(error.what()) + "; its lines are lost";
+      tellSyslog(problem);
+      const std::string line = "zorvagent: " + problem + "\n";
       [[maybe_unused]] const ssize_t written = ::write(STDERR_FILENO, line.data(), line.size());
       return {};
     }
@@ -259,8 +272,20 @@ void setLogSink(LogSink* sink) {
   output().setSink(sink);
 }
 
+bool errorsGoToSyslog() {
+  const std::lock_guard lock(outputMutex);
+  return output().errorsGoToSyslog();
+}
+
+void tellSyslog(const std::string& problem) {
+  if (mayTellSyslog) ::syslog(LOG_DAEMON | LOG_ERR, "zorvagent: %s", problem.c_str());
+}
+
+void neverTellSyslog() { mayTellSyslog = false; }
+
 void resetLog() {
   const std::lock_guard lock(outputMutex);
+  mayTellSyslog = true;
   output().reset();
 }
 

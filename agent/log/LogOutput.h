@@ -33,6 +33,14 @@ void logOwn(int level, const char* function, const char* file, int line, const s
 void setStreamLevel(LogStream stream, int level);
 void setStreamTarget(LogStream stream, const std::string& target);
 
+/// Whether the log's lines of errors go to syslog, because the configuration says so.
+bool errorsGoToSyslog();
+
+/// A line to syslog, whatever the log's target: in a server's process standard error is often closed. Not after
+/// neverTellSyslog(), for programs whose user sees the error.
+void tellSyslog(const std::string& problem);
+void neverTellSyslog();
+
 /// Drops the sink and all settings; the next line reads the configuration again.
 void resetLog();
 

@@ -5,14 +5,18 @@
 #include <fcntl.h>
 #include <gmock/gmock.h>
 #include <malloc.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cstdarg>
 #include <cstdio>
 #include <cstdlib>
 #include <fstream>
 #include <iostream>
 #include <memory>
+#include <sstream>
+#include <stdexcept>
 #include <string>
 #include <vector>
 
@@ -144,11 +148,37 @@ struct Seen {
   std::vector<std::string> ends;
   std::vector<std::string> logged;
   std::vector<std::string> syslogged;
+  std::vector<std::string> sysloggedByFork;
 };
 
 std::vector<std::string> linesOf(const std::string& path) {
   std::vector<std::string> lines;
   std::ifstream in(path);
+  for (std::string line; std::getline(in, line);) lines.push_back(line);
+  return lines;
+}
+
+/// The lines for syslog of a process that is forked from a server's after it has asked.
+std::vector<std::string> syslogOfFork(InstanceProvider& provider) {
+  int ends[2];
+  if (::pipe(ends) != 0) throw std::runtime_error("no pipe");
+  const pid_t child = ::fork();
+  if (child == 0) {
+    syslogLines.clear();
+    for (int i = 0; i < 2; ++i) provider.enumerateInstances(Path("ZORVA_DNSSettingData"));
+    for (const std::string& line : syslogLines) (void)!::write(ends[1], (line + "\n").c_str(), line.size() + 1);
+    ::_exit(0);
+  }
+  ::close(ends[1]);
+  std::string text;
+  char buffer[1024];
+  for (ssize_t count = 0; (count = ::read(ends[0], buffer, sizeof buffer)) > 0;) {
+    text.append(buffer, static_cast<std::size_t>(count));
+  }
+  ::close(ends[0]);
+  ::waitpid(child, nullptr, 0);
+  std::vector<std::string> lines;
+  std::istringstream in(text);
   for (std::string line; std::getline(in, line);) lines.push_back(line);
   return lines;
 }
@@ -173,6 +203,7 @@ Seen enumerateTwice(const zorva::agent::testing::TemporaryDirectory& directory) 
                             std::to_string(outcome.instances().size()));
       }
       askEverything(library, broker);
+      seen.sysloggedByFork = syslogOfFork(provider);
     } catch (const std::exception& error) {
       seen.ends.push_back(std::string("an exception: ") + error.what());
     }
@@ -191,10 +222,36 @@ TEST(PlainLoader, AWrongConfigurationIsAnEmptyEnumerationWithALineToTheLogAndToS
   const zorva::agent::testing::TemporaryDirectory directory;
   directory.write("agent.toml", "[agent]\nlangauge = \"en\"\n");
   const Seen seen = enumerateTwice(directory);
-  const std::string reason = directory / "agent.toml:2: agent.langauge: is not a known key";
+  const std::string reason = directory / "agent.toml:2: agent.langauge: is not a known key; did you mean language?";
   EXPECT_THAT(seen.ends, ElementsAre("CMPI_RC_OK done, 0", "CMPI_RC_OK done, 0"));
-  EXPECT_THAT(seen.logged, ElementsAre(HasSubstr("the tree cannot be read: " + reason)));
+  EXPECT_THAT(seen.logged, ElementsAre(HasSubstr("the tree cannot be read: " + reason), HasSubstr(reason)))
+      << "one of this process, and one of that which was forked";
   EXPECT_THAT(seen.syslogged, ElementsAre("zorvagent: the tree cannot be read: " + reason));
+  EXPECT_THAT(seen.sysloggedByFork, ElementsAre("zorvagent: the tree cannot be read: " + reason));
+}
+
+TEST(PlainLoader, TheReasonIsInSyslogOnceWhateverTheTargetOfTheLog) {
+  for (const char* target : {"off", "syslog", "stderr"}) {
+    SCOPED_TRACE(target);
+    const zorva::agent::testing::TemporaryDirectory directory;
+    directory.write("agent.toml", std::string("[tree]\nsource = \"file\"\nfile = \"none.json\"\n[log]\ntarget = \"") +
+                                      target + "\"\n");
+    const Seen seen = enumerateTwice(directory);
+    EXPECT_THAT(seen.ends, ElementsAre("CMPI_RC_OK done, 0", "CMPI_RC_OK done, 0"));
+    const auto isReason = HasSubstr(directory / "none.json: cannot be read");
+    EXPECT_EQ(std::count_if(seen.syslogged.begin(), seen.syslogged.end(),
+                            [&](const std::string& line) { return ::testing::Matches(isReason)(line); }),
+              1);
+  }
+}
+
+TEST(PlainLoader, ATargetOfTheLogThatCannotBeOpenedIsInSyslog) {
+  const zorva::agent::testing::TemporaryDirectory directory;
+  directory.write("agent.toml", "[tree]\nsource = \"file\"\nfile = \"tree.json\"\n[log]\ntarget = \"absent/log\"\n");
+  directory.write("tree.json", "{}");
+  const std::string problem = "cannot be opened as a log: No such file or directory; its lines are lost";
+  EXPECT_THAT(enumerateTwice(directory).syslogged,
+              ElementsAre("zorvagent: " + (directory / "absent/log") + ": " + problem));
 }
 
 TEST(PlainLoader, ATreeThatCannotBeReadIsAnEmptyEnumerationWithALineToTheLogAndToSyslog) {
@@ -204,7 +261,7 @@ TEST(PlainLoader, ATreeThatCannotBeReadIsAnEmptyEnumerationWithALineToTheLogAndT
   const Seen seen = enumerateTwice(directory);
   const std::string reason = directory / "tree.json:2: system: is not a known key";
   EXPECT_THAT(seen.ends, ElementsAre("CMPI_RC_OK done, 0", "CMPI_RC_OK done, 0"));
-  EXPECT_THAT(seen.logged, ElementsAre(HasSubstr(reason)));
+  EXPECT_THAT(seen.logged, ElementsAre(HasSubstr(reason), HasSubstr(reason)));
   EXPECT_THAT(seen.syslogged, ElementsAre(HasSubstr(reason)));
 }
 
