@@ -97,7 +97,7 @@ TEST_F(AgentTest, ASourceThatThrowsAnythingLeavesTheKernelsName) {
 
 TEST_F(AgentTest, AWrongConfigurationReachesSelectNodeOfAProgramThatAskedAsOneLineAndEverythingElseContinues) {
   ::setenv("ZORVAGENT_CONFIG", directory_.write("agent.toml", "[agent]\nlangauge = \"en\"\n").c_str(), 1);
-  const std::string expected = directory_ / "agent.toml:2: agent.langauge: is not a known key";
+  const std::string expected = directory_ / "agent.toml:2: agent.langauge: is not a known key; did you mean language?";
   askForExceptions();
   ::testing::internal::CaptureStderr();
   for (int i = 0; i < 2; ++i) {

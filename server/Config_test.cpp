@@ -182,7 +182,8 @@ TEST_F(ServerConfig, TheExampleHasEveryKeyWithItsDefault) {
 }
 
 TEST_F(ServerConfig, AnErrorNamesFileLineAndKey) {
-  EXPECT_EQ(wrong("[listen]\nport = 1\nprot = 2\n"), "zorvacimd.toml:3: listen.prot: is not a known key");
+  EXPECT_EQ(wrong("[listen]\nport = 1\nprot = 2\n"),
+            "zorvacimd.toml:3: listen.prot: is not a known key; did you mean port?");
   EXPECT_EQ(wrong("[listen]\nport = \"x\"\n"),
             "zorvacimd.toml:2: listen.port: expected a whole number from 0 to 65535");
   EXPECT_EQ(wrong("[listen]\nport = 65536\n"), "zorvacimd.toml:2: listen.port: must be from 0 to 65535");

@@ -5,6 +5,8 @@
 #include <limits>
 #include <utility>
 
+#include "util/Nearest.h"
+
 #define TOML_HEADER_ONLY 1
 #define TOML_EXCEPTIONS 0
 #define TOML_ENABLE_FORMATTERS 0
@@ -14,6 +16,11 @@ namespace zorva::util {
 namespace {
 
 int lineOf(const toml::source_region& region) { return static_cast<int>(region.begin.line); }
+
+std::string suggestion(std::string_view word, const std::vector<std::string>& known) {
+  const std::string question = didYouMean(word, known);
+  return question.empty() ? question : "; " + question;
+}
 
 }  // namespace
 
@@ -32,7 +39,8 @@ TomlDocument::~TomlDocument() = default;
 void TomlDocument::refuseAllBut(std::initializer_list<std::string_view> names) const {
   for (const auto& [key, node] : parsed_->table) {
     if (std::find(names.begin(), names.end(), key.str()) != names.end()) continue;
-    throw TomlError(lineOf(key.source()), std::string(key.str()), "is not a known table or key");
+    throw TomlError(lineOf(key.source()), std::string(key.str()),
+                    "is not a known table or key" + suggestion(key.str(), {names.begin(), names.end()}));
   }
 }
 
@@ -100,7 +108,8 @@ void TomlTable::finish() const {
   if (table_ == nullptr) return;
   for (const auto& [key, node] : table_->keys) {
     if (std::find(known_.begin(), known_.end(), key.str()) != known_.end()) continue;
-    throw TomlError(lineOf(key.source()), name_ + '.' + std::string(key.str()), "is not a known key");
+    throw TomlError(lineOf(key.source()), name_ + '.' + std::string(key.str()),
+                    "is not a known key" + suggestion(key.str(), {known_.begin(), known_.end()}));
   }
 }
 

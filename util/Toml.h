@@ -36,7 +36,7 @@ class TomlDocument : util::NotCopied {
   explicit TomlDocument(const std::string& text);
   ~TomlDocument();
 
-  /// Throws TomlError for anything at the top but tables and keys of these names.
+  /// Throws TomlError for anything at the top but tables and keys of these names; it suggests the nearest of them.
   void refuseAllBut(std::initializer_list<std::string_view> names) const;
 
  private:
@@ -61,7 +61,7 @@ class TomlTable : util::NotCopied {
   /// A list of texts that is not empty; `expected` describes it in the error.
   void take(const char* key, std::optional<std::vector<std::string>>& value, const char* expected);
 
-  /// Refuses the keys that were not taken.
+  /// Refuses the keys that were not taken, and suggests the nearest of those that were.
   void finish() const;
 
   [[noreturn]] void fail(const char* key, const std::string& problem) const;

@@ -88,8 +88,8 @@ TEST_F(ConfigTest, PathsAreTakenFromTheDirectoryOfTheFile) {
 
 TEST_F(ConfigTest, AnUnknownTableOrKeyIsNamedWithItsLine) {
   const Cases cases = {
-      {"[agent]\n\ndata_dri = 1\n", "agent.toml:3: agent.data_dri: is not a known key"},
-      {"[agnet]\n", "agent.toml:1: agnet: is not a known table or key"},
+      {"[agent]\n\ndata_dri = 1\n", "agent.toml:3: agent.data_dri: is not a known key; did you mean data_dir?"},
+      {"[agnet]\n", "agent.toml:1: agnet: is not a known table or key; did you mean agent?"},
       {"level = 1\n", "agent.toml:1: level: is not a known table or key"},
       {"[log]\n\"a\\nb\" = 1\n", "agent.toml:2: log.a\\nb: is not a known key"},
   };

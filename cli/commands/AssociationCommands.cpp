@@ -39,7 +39,7 @@ void requireRole(const char* option, const std::string& role, const std::vector<
   }
   throw Failure(ExitCode::WrongUsage,
                 std::string(option) + ": no association that is meant has a reference " + printable(role),
-                "there are " + joined(names, ", "));
+                nearestOr(role, names, "there are " + joined(names, ", ")));
 }
 
 /// The filter of the command line, with its class names checked and in the schema's spelling. The result class in the

@@ -97,9 +97,17 @@ CLI::Option* addTexts(CLI::App& app, const std::string& name, const std::string&
   return app.add_option(name, read, description)->type_name("TEXT")->expected(CLI::detail::expected_max_vector_size);
 }
 
+std::vector<std::string> namesOf(const std::vector<OutputFormat>& formats) {
+  std::vector<std::string> names;
+  for (const OutputFormat each : formats) names.emplace_back(formatName(each));
+  return names;
+}
+
 OutputFormat formatOf(const std::string& word) {
   if (const auto format = formatNamed(word)) return *format;
-  throw CLI::ValidationError("--output", "'" + printable(word) + "' is none of table, json, mof, xml, dot, svg");
+  const std::vector<std::string> known = namesOf({std::begin(kAllFormats), std::end(kAllFormats)});
+  throw CLI::ValidationError("--output", "'" + printable(word) + "' is no format; " +
+                                             nearestOr(word, known, "there are " + joined(known, ", ")));
 }
 
 int levelOf(const std::string& word) {
@@ -182,12 +190,6 @@ void addGlobalOptions(CLI::App& app, Globals& globals) {
   addServerOptions(app, globals.servers, {config, directory});
 }
 
-std::vector<std::string> namesOf(const std::vector<OutputFormat>& formats) {
-  std::vector<std::string> names;
-  for (const OutputFormat each : formats) names.emplace_back(formatName(each));
-  return names;
-}
-
 bool takesValue(const CLI::Option& option) { return option.get_items_expected_max() > 0; }
 
 const CLI::Option* optionNamed(const CLI::App& at, const std::string& word) {
@@ -210,22 +212,53 @@ void addOnce(std::vector<std::string>& words, const std::string& word) {
   if (std::find(words.begin(), words.end(), word) == words.end()) words.push_back(word);
 }
 
+bool isLikeAnOption(const std::string& word) { return word.size() > 1 && word.starts_with('-'); }
+
+/// Every option that may be given to a subcommand.
+std::vector<std::string> optionsAt(const CLI::App& at) {
+  std::vector<std::string> names;
+  for (const CLI::App* app = &at; app != nullptr; app = app->get_parent()) {
+    for (const CLI::Option* option : app->get_options()) {
+      for (const std::string& name : option->get_lnames()) names.push_back("--" + name);
+    }
+  }
+  return names;
+}
+
+/// What to do about the first of these words that looks like an option; empty if none does.
+std::string hintForOption(const CLI::App& at, const std::vector<std::string>& unknown) {
+  const auto option = std::find_if(unknown.begin(), unknown.end(), isLikeAnOption);
+  if (option == unknown.end()) return {};
+  const std::string name = option->substr(0, option->find('='));
+  return nearestOr(name, optionsAt(at), "a value that begins with '-' goes after --") +
+         (name.starts_with("--") ? " " : "; ");
+}
+
+/// A misspelt subcommand gets the nearest one; where none is given, the few that there are.
+Telling wrongSubcommand(const CLI::App& at, const std::string& call, const std::vector<std::string>& unknown) {
+  const std::vector<std::string> known = shownSubcommandsOf(at);
+  if (unknown.empty()) {
+    const bool areFew = known.size() <= 8;
+    return {call + " needs a subcommand", true,
+            (areFew ? "it has " + joined(known, ", ") + "; " : std::string()) + call + " --help " +
+                (areFew ? "tells more" : "lists them")};
+  }
+  return {call + " has no subcommand '" + printable(unknown.front()) + "'", true,
+          nearestOr(unknown.front(), known, call + " --help lists those that it has")};
+}
+
 /// The error in words that name the subcommand, and how to show its usage.
 Telling wrongUsage(const CLI::App& app, const CLI::ParseError& error) {
   const CLI::App* at = &app;
   while (!at->get_subcommands().empty()) at = at->get_subcommands().back();
   const std::string call = "zorvactl" + (at == &app ? std::string() : " " + callOf(*at));
   const std::vector<std::string> unknown = app.remaining(true);
-  if (at->get_require_subcommand_min() == 0 || dynamic_cast<const CLI::RequiredError*>(&error) == nullptr) {
-    const bool isLikeAnOption = std::any_of(unknown.begin(), unknown.end(), [](const std::string& word) {
-      return word.size() > 1 && word.starts_with('-');
-    });
-    return {printable(error.what()), true,
-            (isLikeAnOption ? "a value that begins with '-' goes after --; " : "") + call + " --help shows the usage"};
-  }
-  return {
-      unknown.empty() ? call + " needs a subcommand" : call + " has no subcommand '" + printable(unknown.front()) + "'",
-      true, "it has " + joined(shownSubcommandsOf(*at), ", ") + "; " + call + " --help tells more"};
+  const bool lacksSubcommand =
+      at->get_require_subcommand_min() != 0 && dynamic_cast<const CLI::RequiredError*>(&error) != nullptr;
+  const bool isOption = !unknown.empty() && isLikeAnOption(unknown.front());
+  if (lacksSubcommand && !isOption) return wrongSubcommand(*at, call, unknown);
+  const std::string hint = hintForOption(*at, unknown);
+  return {printable(error.what()), true, hint + call + " --help shows the usage"};
 }
 
 }  // namespace

@@ -144,7 +144,8 @@ TEST(CommandLine, RefusesWhatItDoesNotKnow) {
 }
 
 TEST(CommandLine, NamesTheFormatThatItDoesNotKnow) {
-  EXPECT_THAT(tellingOf({"ei", "C", "--output", "y\x1Bml"}).text, HasSubstr("'y\\x1Bml' is none of table, json, mof"));
+  EXPECT_THAT(tellingOf({"ei", "C", "--output", "y\x1Bml"}).text,
+              HasSubstr("'y\\x1Bml' is no format; there are table, json, mof"));
 }
 
 TEST(CommandLine, HasHelpForItselfAndEachSubcommand) {
@@ -174,11 +175,23 @@ TEST(Completion, OffersTheFormats) { EXPECT_THAT(completionAfter({"--output"}).w
 
 TEST(CommandLine, NamesTheSubcommandThatIsNot) {
   EXPECT_EQ(tellingOf({"frob"}).text, "zorvactl has no subcommand 'frob'");
-  EXPECT_THAT(tellingOf({"frob"}).hint, HasSubstr("it has show, check, tree, "));
+  EXPECT_THAT(tellingOf({"frob"}).hint, HasSubstr("zorvactl --help lists those that it has"));
   EXPECT_EQ(tellingOf({"dns", "fr\x1Bob"}).text, "zorvactl dns has no subcommand 'fr\\x1Bob'");
   EXPECT_EQ(tellingOf({"dns"}).text, "zorvactl dns needs a subcommand");
   EXPECT_EQ(tellingOf({"dns"}).hint, "it has show, set, add, remove; zorvactl dns --help tells more");
   EXPECT_EQ(tellingOf({"ei"}).hint, "zorvactl enumerate --help shows the usage");
+  EXPECT_EQ(tellingOf({}).hint, "zorvactl --help lists them");
+}
+
+TEST(CommandLine, SuggestsTheNearestWordAndNotAllThatThereAre) {
+  EXPECT_EQ(tellingOf({"shwo"}).hint, "did you mean show?");
+  EXPECT_EQ(tellingOf({"dns", "sett", "eth0"}).hint, "did you mean set?");
+  EXPECT_EQ(tellingOf({"show", "--ouput", "json"}).hint, "did you mean --output? zorvactl show --help shows the usage");
+  EXPECT_EQ(tellingOf({"dns", "set", "eth0", "--dryrun"}).hint,
+            "did you mean --dry-run? zorvactl dns set --help shows the usage");
+  EXPECT_THAT(tellingOf({"show", "--output", "jsn"}).text, HasSubstr("'jsn' is no format; did you mean json?"));
+  EXPECT_EQ(tellingOf({"show", "-x"}).hint,
+            "a value that begins with '-' goes after --; zorvactl show --help shows the usage");
 }
 
 TEST(CommandLine, RequiresALevelThatIsANumber) {
@@ -225,7 +238,7 @@ std::vector<std::vector<std::string>> calls() {
 TEST(ManualPage, HasEverySubcommandAndOption) {
   std::string page = zorva::agent::testing::contentsOf(ZORVA_SOURCE_DIR "/cli/zorvactl.1");
   for (std::size_t at = page.find("\\-"); at != std::string::npos; at = page.find("\\-")) page.replace(at, 2, "-");
-  EXPECT_EQ(calls().size(), 45U);
+  EXPECT_EQ(calls().size(), 48U);
   for (const std::vector<std::string>& call : calls()) {
     EXPECT_THAT(page, testing::ContainsRegex("[ \"]" + call.back() + "[ \"\n]")) << call.front();
     for (const std::string& word : completionAfter(call).words) EXPECT_THAT(page, HasSubstr(word)) << call.back();

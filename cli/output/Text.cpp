@@ -5,6 +5,7 @@
 #include <cstdio>
 #include <cwchar>
 
+#include "util/Nearest.h"
 #include "util/Utf8.h"
 
 namespace zorva::cli {
@@ -167,6 +168,11 @@ std::string joined(const std::vector<std::string>& texts, std::string_view separ
     out += text;
   }
   return out;
+}
+
+std::string nearestOr(std::string_view word, const std::vector<std::string>& known, const std::string& otherwise) {
+  const std::string question = util::didYouMean(word, known);
+  return question.empty() ? otherwise : printable(question);
 }
 
 std::string counted(std::size_t count, std::string_view noun) {

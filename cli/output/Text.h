@@ -36,6 +36,9 @@ std::string asUtf8(std::string_view text);
 /// The texts with `separator` between them.
 std::string joined(const std::vector<std::string>& texts, std::string_view separator);
 
+/// What to do about a word that is none of the known ones: "did you mean eth0?" if one of them is near, else this.
+std::string nearestOr(std::string_view word, const std::vector<std::string>& known, const std::string& otherwise);
+
 /// "1 instance", "2 instances".
 std::string counted(std::size_t count, std::string_view noun);
 

@@ -19,7 +19,7 @@ namespace zorva::cli {
 namespace {
 
 constexpr const char* kServiceProcessorClass = "ZORVA_SPComputerSystem";
-constexpr std::size_t kListedNames = 20;
+constexpr const char* kAllInterfaces = "zorvactl show --all lists those that it has";
 
 std::optional<std::uint64_t> numberOf(const broker::Instance& instance, std::string_view property) {
   const broker::Value* value = instance.property(property);
@@ -392,7 +392,7 @@ void keepOnly(HostView& view, const std::vector<std::string>& names) {
   std::vector<std::string> known;
   std::vector<InterfaceRow> kept;
   for (InterfaceRow& row : view.interfaces) {
-    if (known.size() < kListedNames) known.push_back(printable(row.name));
+    known.push_back(row.name);
     if (!wanted.contains(row.name)) continue;
     found.insert(row.name);
     kept.push_back(std::move(row));
@@ -400,7 +400,7 @@ void keepOnly(HostView& view, const std::vector<std::string>& names) {
   for (const std::string& name : names) {
     if (found.contains(name)) continue;
     throw Failure(ExitCode::Failed, "this host has no interface " + printable(name),
-                  known.empty() ? "it has none at all" : "it has " + joined(known, ", "));
+                  known.empty() ? "it has none at all" : nearestOr(name, known, kAllInterfaces));
   }
   view.interfaces = std::move(kept);
 }

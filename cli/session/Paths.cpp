@@ -102,6 +102,19 @@ bool isComplete(Session& session, const broker::ObjectPath& path, const schema::
   });
 }
 
+/// What to do about the first key that the class lacks; empty if none is near.
+std::string nearestKey(const broker::ObjectPath& typed, const schema::Class& declared) {
+  std::vector<std::string> known;
+  for (const schema::ClassProperty* key : declared.keys()) known.push_back(key->name);
+  const auto isKnown = [&known](const std::string& name) {
+    return std::any_of(known.begin(), known.end(), [&](const std::string& each) { return util::sameName(each, name); });
+  };
+  for (const broker::NamedValue& key : typed.keys) {
+    if (!isKnown(key.name)) return nearestOr(key.name, known, {});
+  }
+  return {};
+}
+
 std::vector<broker::ObjectPath> matchingInstances(Session& session, const broker::ObjectPath& given,
                                                   std::vector<broker::ObjectPath>& all) {
   std::vector<broker::ObjectPath> matching;
@@ -154,7 +167,8 @@ broker::ObjectPath resolvePath(Session& session, std::string_view text) {
   const schema::Class& declared = session.classNamed(typed.className);
   const auto canonical = session.cim().canonicalPath(typed);
   if (!canonical) {
-    throw Failure(ExitCode::WrongUsage, printable(text) + ": " + printable(canonical.error().message));
+    throw Failure(ExitCode::WrongUsage, printable(text) + ": " + printable(canonical.error().message),
+                  nearestKey(typed, declared));
   }
   const broker::ObjectPath& given = *canonical;
   requireClassesOfReferences(session, given);

@@ -4,6 +4,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <set>
 #include <vector>
 
 #include "agent/Agent.h"
@@ -16,24 +17,50 @@
 #include "schema/Schema.h"
 #include "util/LogLevels.h"
 #include "util/Names.h"
+#include "util/Nearest.h"
 
 namespace zorva::cli {
 
 namespace {
 
-std::string similarNames(const schema::ClassRepository& classes, std::string_view name) {
-  std::vector<std::string> similar;
-  std::string wanted(name);
-  std::transform(wanted.begin(), wanted.end(), wanted.begin(), util::lowerAscii);
-  if (const std::size_t underscore = wanted.find('_'); underscore != std::string::npos) wanted.erase(0, underscore + 1);
-  for (const schema::Class* each : classes.classes()) {
-    std::string known = each->name();
-    std::transform(known.begin(), known.end(), known.begin(), util::lowerAscii);
-    const bool fits = wanted.size() >= 3 && known.find(wanted) != std::string::npos;
-    if (fits && known.starts_with("zorva_") && similar.size() < 5) similar.push_back(each->name());
+std::string inSmallLetters(std::string_view text) {
+  std::string small(text);
+  std::transform(small.begin(), small.end(), small.begin(), util::lowerAscii);
+  return small;
+}
+
+/// The name without the schema's: "DNSSettingData".
+std::string_view withoutSchema(std::string_view name) {
+  const std::size_t underscore = name.find('_');
+  return underscore == std::string_view::npos ? name : name.substr(underscore + 1);
+}
+
+/// The shortest class of this project's that has the name in its own; empty if none has, or the name is very short.
+std::string classWith(const std::vector<std::string>& names, std::string_view name) {
+  const std::string wanted = inSmallLetters(withoutSchema(name));
+  std::string found;
+  for (const std::string& each : names) {
+    const std::string known = inSmallLetters(each);
+    const bool fits = wanted.size() >= 3 && known.starts_with("zorva_") && known.find(wanted) != std::string::npos;
+    if (fits && (found.empty() || each.size() < found.size())) found = each;
   }
-  if (similar.empty()) return "zorvactl classes lists them";
-  return "is it " + joined(similar, ", ") + "?";
+  return found;
+}
+
+/// What to do about a class that does not exist.
+std::string similarName(const schema::ClassRepository& classes, std::string_view name) {
+  std::vector<std::string> names;
+  std::vector<std::string> own;
+  for (const schema::Class* each : classes.classes()) {
+    names.push_back(each->name());
+    if (each->name().starts_with("ZORVA_")) own.push_back(each->name());
+  }
+  // A part of a name, or a name without its schema, is meant as one of this project's.
+  const bool hasSchema = name.find('_') != std::string_view::npos;
+  std::string near = hasSchema ? util::nearest(name, own) : util::nearest("ZORVA_" + std::string(name), own);
+  if (near.empty()) near = classWith(names, name);
+  if (near.empty()) near = util::nearest(name, names);
+  return near.empty() ? "zorvactl classes lists them" : "did you mean " + near + "?";
 }
 
 /// Drops the providers' lines, and prints the agent's own.
@@ -110,7 +137,7 @@ const std::shared_ptr<const schema::ClassRepository>& Session::classes() {
 const schema::Class& Session::classNamed(std::string_view name) {
   const schema::Class* found = isRemote() ? cim().classNamed(name) : classes()->find(name);
   if (found != nullptr) return *found;
-  throw Failure(ExitCode::WrongUsage, "there is no class " + printable(name), similarNames(*classes(), name));
+  throw Failure(ExitCode::WrongUsage, "there is no class " + printable(name), similarName(*classes(), name));
 }
 
 std::shared_ptr<const zorva::agent::TreeSnapshot> Session::tree() const {
@@ -191,6 +218,23 @@ std::string nextStepIfDenied(const Session& session, const broker::Status& statu
   return "log in as a user with the role operate: --url https://USER@" + (server.isEncrypted() ? server.host : "HOST");
 }
 
+namespace {
+
+/// The properties of a class and of those below it; without one, of all classes.
+std::vector<std::string> propertiesOf(const std::vector<const schema::Class*>& classes, const schema::Class* top) {
+  std::set<std::string> names;
+  const auto add = [&names](const schema::Class& each) {
+    for (const schema::ClassProperty* property : each.properties()) names.insert(property->name);
+  };
+  if (top != nullptr) add(*top);
+  for (const schema::Class* each : classes) {
+    if (top == nullptr || each->isA(*top)) add(*each);
+  }
+  return {names.begin(), names.end()};
+}
+
+}  // namespace
+
 broker::Selection selectionOf(Session& session, const std::vector<std::string>& properties, const schema::Class* top) {
   broker::Selection selection;
   if (properties.empty()) return selection;
@@ -200,10 +244,11 @@ broker::Selection selectionOf(Session& session, const std::vector<std::string>& 
       return (top == nullptr || each->isA(*top)) && each->findProperty(property) != nullptr;
     };
     if (std::any_of(classes.begin(), classes.end(), hasIt) || (top != nullptr && hasIt(top))) continue;
-    throw Failure(ExitCode::WrongUsage,
-                  (top == nullptr ? "no class" : "neither " + top->name() + " nor a class below it") +
-                      " has a property " + printable(property),
-                  "the same command without --property shows what there is");
+    throw Failure(
+        ExitCode::WrongUsage,
+        (top == nullptr ? "no class" : "neither " + top->name() + " nor a class below it") + " has a property " +
+            printable(property),
+        nearestOr(property, propertiesOf(classes, top), "the same command without --property shows what there is"));
   }
   selection.propertyList = properties;
   return selection;

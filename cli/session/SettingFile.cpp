@@ -176,10 +176,11 @@ const zorva::agent::Node& interfaceNode(const zorva::agent::TreeSnapshot& tree, 
     if (node.type() != zorva::agent::NodeType::NetworkIPConfig) continue;
     const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
     if (name != nullptr && *name == interface) return node;
-    if (name != nullptr && names.size() < 20) names.push_back(printable(*name));
+    if (name != nullptr) names.push_back(*name);
   }
   throw Failure(ExitCode::Failed, "this host has no interface " + printable(interface),
-                names.empty() ? "it has none at all" : "it has " + joined(names, ", "));
+                names.empty() ? "it has none at all"
+                              : nearestOr(interface, names, "zorvactl show --all lists those that it has"));
 }
 
 }  // namespace zorva::cli
