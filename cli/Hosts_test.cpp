@@ -172,11 +172,11 @@ TEST_F(Hosts, AreInEachRowOfTheJson) {
     all.insert(all.end(), {"-o", "json"});
     const Outcome outcome = run(all);
     EXPECT_EQ(outcome.exitCode, 0) << outcome.err;
-    return json::parse(outcome.out);
+    return contentOf(outcome.out);
   };
   const auto aloneOf = [&](Words words) {
     words.insert(words.end(), {"-o", "json", "--url", two_.url()});
-    return json::parse(first_.run(words).out);
+    return contentOf(first_.run(words).out);
   };
   json rows = resultsOf({"names", "ZORVA_DNSSettingData"});
   ASSERT_EQ(rows.size(), 4U);
@@ -215,7 +215,7 @@ TEST_F(Hosts, EachReportItsFailure) {
   EXPECT_THAT(outcome.out, AllOf(HasSubstr(labelOf(one_)), Not(HasSubstr(labelOf(two_)))));
   EXPECT_THAT(outcome.err,
               AllOf(HasSubstr("zorvactl: " + labelOf(two_) + ": there are no DNS settings of an interface"),
-                    HasSubstr("there are those of eth0, eth7\n"), EndsWith("zorvactl: 1 of 2 hosts failed\n")));
+                    HasSubstr("did you mean eth0?\n"), EndsWith("zorvactl: 1 of 2 hosts failed\n")));
   EXPECT_EQ(run({"ei", "ZORVA_DNSProtocol"}).exitCode, 2) << "wrong usage on each";
 }
 

@@ -9,16 +9,12 @@
 #include <regex>
 #include <sstream>
 
-#include "cli/testing/TestHost.h"
+#include "cli/testing/Running.h"
 
 namespace zorva::cli {
 namespace {
 
-using nlohmann::json;
-using testing::AllOf;
 using testing::Each;
-using testing::EndsWith;
-using testing::HasSubstr;
 
 /// The processor time in seconds that children of this process have used.
 double secondsOfChildren() {
@@ -46,7 +42,7 @@ TEST(ManyInterfaces, EightTimesAsManyTakeAboutEightTimesAsLong) {
 
 std::vector<json> countsOfAssociations(const TestHost& host, const std::vector<std::string>& words) {
   std::vector<json> counts;
-  for (const json& row : json::parse(host.run(words).out)) {
+  for (const json& row : contentOf(host.run(words).out)) {
     const std::string name = row["class"];
     const bool isAssociation = name.ends_with("Element") || name.ends_with("Dependency") ||
                                name.ends_with("ElementSettingData") || name.ends_with("OrderedComponent") ||
@@ -107,7 +103,7 @@ TEST(ManyInterfaces, ALineSaysWhatTakesLongAndIsErased) {
 
 TEST(Show, HasInterfacesInTheOrderOfTheirNames) {
   const TestHost host({TestHost::port("eth2"), TestHost::port("eth10"), TestHost::port("eth1")});
-  const json view = json::parse(host.run({"show", "-o", "json"}).out);
+  const json view = contentOf(host.run({"show", "-o", "json"}).out);
   std::vector<std::string> names;
   for (const json& row : view["interfaces"]) names.push_back(row["name"]);
   EXPECT_THAT(names, testing::ElementsAre("eth1", "eth10", "eth2"));

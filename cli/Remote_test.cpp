@@ -148,14 +148,14 @@ json withoutWhatCimDoesNotSay(json view) {
 }
 
 TEST_F(Remote, ShowsTheSameButWhatCimDoesNotSay) {
-  const json here = json::parse(local({"show", "-o", "json"}).out);
-  EXPECT_EQ(json::parse(remote({"show", "-o", "json"}).out), withoutWhatCimDoesNotSay(here));
-  json classes = json::parse(local({"classes", "-o", "json"}).out);
+  const json here = contentOf(local({"show", "-o", "json"}).out);
+  EXPECT_EQ(contentOf(remote({"show", "-o", "json"}).out), withoutWhatCimDoesNotSay(here));
+  json classes = contentOf(local({"classes", "-o", "json"}).out);
   for (json& row : classes) {
     row.erase("provider");
     row.erase("library");
   }
-  EXPECT_EQ(json::parse(remote({"classes", "-o", "json"}).out), classes);
+  EXPECT_EQ(contentOf(remote({"classes", "-o", "json"}).out), classes);
 
   const std::string table = remote({"show"}).out;
   EXPECT_THAT(table, AllOf(StartsWith("DNS client configuration of host1\n"), Not(HasSubstr("FROM"))));

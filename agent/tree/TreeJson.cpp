@@ -8,11 +8,16 @@
 #include <utility>
 
 #include "agent/tree/IpAddress.h"
+#include "util/Nearest.h"
+
 namespace zorva::agent {
 namespace {
 
 using namespace ZV::NodeLexicon;
 using Kind = JsonValue::Kind;
+
+// Of the documents that are written. One without a version is read as well: people write them by hand.
+constexpr std::uint64_t kTreeVersion = 1;
 
 struct TypeName {
   NodeType type;
@@ -102,11 +107,17 @@ const std::vector<JsonValue>& itemsOf(const JsonValue& value, const Place& place
   return value.items;
 }
 
+std::string withSuggestion(const std::string& problem, std::string_view word, const std::vector<std::string>& known) {
+  const std::string question = util::didYouMean(word, known);
+  return question.empty() ? problem : problem + "; " + question;
+}
+
 void checkObject(const JsonValue& value, const Place& place, std::initializer_list<std::string_view> known) {
   if (value.kind != Kind::Object) place.fail(value, "expected an object");
   for (std::size_t i = 0; i < value.keys.size(); ++i) {
     if (std::find(known.begin(), known.end(), value.keys[i]) == known.end()) {
-      place.member(value.keys[i]).fail(value.items[i], "is not a known key");
+      place.member(value.keys[i])
+          .fail(value.items[i], withSuggestion("is not a known key", value.keys[i], {known.begin(), known.end()}));
     }
   }
 }
@@ -183,12 +194,20 @@ NodeType typeOf(const JsonValue& value, const Place& place) {
   place.fail(value, "expected \"System\", \"Port\" or \"NetworkIPConfig\"");
 }
 
+std::vector<std::string> propertyNames() {
+  std::vector<std::string> names;
+  for (const PropertyName& property : kProperties) names.emplace_back(property.name);
+  return names;
+}
+
 void readProperties(const JsonValue& value, const Place& place, TreeBuilder& builder, std::size_t node) {
   if (value.kind != Kind::Object) place.fail(value, "expected an object");
   for (std::size_t i = 0; i < value.keys.size(); ++i) {
     const Place member = place.member(value.keys[i]);
     const PropertyNumber number = propertyNumber(value.keys[i]);
-    if (number == 0) member.fail(value.items[i], "is not a known property");
+    if (number == 0) {
+      member.fail(value.items[i], withSuggestion("is not a known property", value.keys[i], propertyNames()));
+    }
     builder.set(node, number, valueOf(number, value.items[i], member));
   }
 }
@@ -299,6 +318,7 @@ JsonValue propertyToJson(const PropertyValue& value) {
 
 JsonValue treeToJsonValue(const TreeSnapshot& tree) {
   JsonValue document = JsonValue::object();
+  document.add("version", JsonValue::ofNumber(kTreeVersion));
   document.add("system_name", JsonValue::ofText(tree.systemName()));
   document.add("nodes", nodesToJson(tree, tree.root()));
   return document;
@@ -306,7 +326,13 @@ JsonValue treeToJsonValue(const TreeSnapshot& tree) {
 
 std::shared_ptr<const TreeSnapshot> treeFromJsonValue(const JsonValue& document, const std::string& name) {
   const Place place{name, {}};
-  checkObject(document, place, {"system_name", "nodes"});
+  checkObject(document, place, {"version", "system_name", "nodes"});
+  if (const JsonValue* version = document.find("version"); version != nullptr) {
+    if (version->kind != Kind::Number || version->number != kTreeVersion) {
+      place.member("version").fail(*version,
+                                   "expected " + std::to_string(kTreeVersion) + ", the one that is known here");
+    }
+  }
   const JsonValue* systemName = document.find("system_name");
   TreeBuilder builder(systemName == nullptr ? "" : textOf(*systemName, place.member("system_name")));
   const JsonValue* nodes = document.find("nodes");

@@ -18,6 +18,7 @@ using testing::TemporaryDirectory;
 using namespace ZV::NodeLexicon;
 
 constexpr const char* kExample = R"({
+  "version": 1,
   "system_name": "host1",
   "nodes": [
     {
@@ -152,10 +153,11 @@ TEST(TreeJson, WhatIsNoJsonIsNamedWithItsLine) {
 }
 
 TEST(TreeJson, UnknownKeysAreNamed) {
-  EXPECT_EQ(wrong("{\n\"nods\": []}"), "tree.json:2: nods: is not a known key");
-  EXPECT_EQ(wrong(nodeWith("\"childern\": []")), "tree.json:3: nodes[0].childern: is not a known key");
+  EXPECT_EQ(wrong("{\n\"nods\": []}"), "tree.json:2: nods: is not a known key; did you mean nodes?");
+  EXPECT_EQ(wrong(nodeWith("\"childern\": []")),
+            "tree.json:3: nodes[0].childern: is not a known key; did you mean children?");
   EXPECT_EQ(wrong(nodeWith("\"properties\": {\n\"nmae\": 1}")),
-            "tree.json:4: nodes[0].properties.nmae: is not a known property");
+            "tree.json:4: nodes[0].properties.nmae: is not a known property; did you mean name?");
 }
 
 TEST(TreeJson, WrongTypesAreNamed) {
@@ -163,6 +165,10 @@ TEST(TreeJson, WrongTypesAreNamed) {
   EXPECT_EQ(wrong("{\"nodes\": {}}"), "tree.json:1: nodes: expected a list");
   EXPECT_EQ(wrong("{\"nodes\": [1]}"), "tree.json:1: nodes[0]: expected an object");
   EXPECT_EQ(wrong("{\"system_name\": null}"), "tree.json:1: system_name: expected a text");
+  for (const char* version : {"2", "\"1\"", "0", "null"}) {
+    EXPECT_EQ(wrong(std::string("{\"version\": ") + version + "}"),
+              "tree.json:1: version: expected 1, the one that is known here");
+  }
   EXPECT_EQ(wrong(nodeWith("\"description\": 1")), "tree.json:3: nodes[0].description: expected a text");
   EXPECT_EQ(wrong(nodeWith("\"properties\": []")), "tree.json:3: nodes[0].properties: expected an object");
   EXPECT_EQ(wrong(nodeWith("\"properties\": {\"name\": 1\n}")),

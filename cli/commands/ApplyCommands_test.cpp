@@ -76,9 +76,10 @@ bool isAppliedAndReverted() {
             "eth0  dns_server_addresses  192.0.2.1  ->  192.0.2.53\neth0: applied by /etc/resolv.conf\n[0]\n");
   EXPECT_EQ(resolvConf(), "# by hand\nnameserver 192.0.2.53\nsearch old.example\noptions ndots:2\n");
   EXPECT_EQ(run("apply"), "eth0  the host has these settings already\n[0]\n");
-  EXPECT_EQ(run("apply --output json"),
-            "[\n  {\n    \"interface\": \"eth0\",\n    \"owner\": \"/etc/resolv.conf\",\n    \"profile\": \"\",\n"
-            "    \"changes\": []\n  }\n]\n[0]\n");
+  EXPECT_EQ(
+      run("apply --output json"),
+      "{\n  \"version\": 1,\n  \"results\": [\n    {\n      \"interface\": \"eth0\",\n"
+      "      \"owner\": \"/etc/resolv.conf\",\n      \"profile\": \"\",\n      \"changes\": []\n    }\n  ]\n}\n[0]\n");
 
   EXPECT_THAT(run("revert"), AllOf(HasSubstr("needs names of interfaces, or --all"), EndsWith("[2]\n")));
   EXPECT_EQ(run("revert eth0"),

@@ -31,11 +31,16 @@ struct InvokeOptions {
 };
 
 template <typename Element>
-std::string namesOf(const std::vector<Element>& elements) {
+std::vector<std::string> namesOf(const std::vector<Element>& elements) {
   std::vector<std::string> names;
   names.reserve(elements.size());
   for (const auto& element : elements) names.push_back(element->name);
-  return joined(names, ", ");
+  return names;
+}
+
+/// What to do about a method or parameter that is none of these few.
+std::string nearestOrAll(const std::string& word, const std::vector<std::string>& known) {
+  return nearestOr(word, known, known.empty() ? "it has none" : "it has " + joined(known, ", "));
 }
 
 broker::Property parseChange(const schema::Class& declared, const Assignment& assignment) {
@@ -43,7 +48,7 @@ broker::Property parseChange(const schema::Class& declared, const Assignment& as
   if (property == nullptr) {
     throw Failure(ExitCode::WrongUsage,
                   "the class " + declared.name() + " has no property " + printable(assignment.name),
-                  "it has " + namesOf(declared.properties()));
+                  nearestOr(assignment.name, namesOf(declared.properties()), "zorvactl get shows those that it has"));
   }
   if (property->isKey) {
     throw Failure(ExitCode::WrongUsage, property->name + " is a key of " + declared.name() + " and cannot be changed");
@@ -55,7 +60,7 @@ const schema::ClassMethod& methodNamed(const schema::Class& declared, const std:
   const schema::ClassMethod* method = declared.findMethod(name);
   if (method != nullptr) return *method;
   throw Failure(ExitCode::WrongUsage, "the class " + declared.name() + " has no method " + printable(name),
-                declared.methods().empty() ? "it has none" : "it has " + namesOf(declared.methods()));
+                nearestOrAll(name, namesOf(declared.methods())));
 }
 
 broker::NamedValue parseParameter(const schema::ClassMethod& method, const Assignment& assignment) {
@@ -66,7 +71,7 @@ broker::NamedValue parseParameter(const schema::ClassMethod& method, const Assig
   std::vector<std::string> names;
   for (const schema::Parameter& parameter : method.parameters) names.push_back(parameter.name);
   throw Failure(ExitCode::WrongUsage, method.name + " has no parameter " + printable(assignment.name),
-                names.empty() ? "it has none" : "it has " + joined(names, ", "));
+                nearestOrAll(assignment.name, names));
 }
 
 /// "SetDNSDomain takes DNSDomain (string)".
@@ -122,7 +127,7 @@ void modifyInstance(const Globals& globals, const ModifyOptions& options) {
   const Session::Changing alone(session, change.dryRun);
   const broker::Instance instance = changeInstance(session, path, changes, change);
   if (globals.output == OutputFormat::Json) {
-    write(instanceJson(instance, 0) + "\n");
+    write(instanceDocument(instance) + "\n");
   } else {
     writeChanges(session, instance, changes, change);
   }

@@ -57,7 +57,7 @@ TEST_F(Changing, ModifyOfAnEndpointChangesTheTreeAndNotTheFile) {
   EXPECT_EQ(file(), kWholeFile);
   EXPECT_THAT(done(host_, {"tree"}), AllOf(HasSubstr("node.example.org  (set; not the host's own)\n"),
                                            HasSubstr("host_name             host1\n")));
-  EXPECT_EQ(json::parse(done(host_, {"overlay", "show", "-o", "json"})),
+  EXPECT_EQ(contentOf(done(host_, {"overlay", "show", "-o", "json"})),
             json::parse(R"([{"node": "/system/eth0/ip", "property": "domain_name", "value": "node.example.org"},
                             {"node": "/system/eth0/ip", "property": "dns_suffixes", "value": ["x.example"]}])"));
 }
@@ -65,7 +65,7 @@ TEST_F(Changing, ModifyOfAnEndpointChangesTheTreeAndNotTheFile) {
 TEST(Modify, OfAnEndpointDoesNotSetWhatTheHostLeavesEmpty) {
   const TestHost host({TestHost::port("eth0")});
   done(host, {"mi", kEndpoint, "DNSSuffixesToAppend=x.example"});
-  EXPECT_EQ(json::parse(done(host, {"overlay", "show", "-o", "json"})).size(), 1U);
+  EXPECT_EQ(contentOf(done(host, {"overlay", "show", "-o", "json"})).size(), 1U);
 }
 
 TEST(Modify, FailsIfThereIsNoFile) {
@@ -138,7 +138,7 @@ TEST_F(Changing, ModifyRefusesWhatItCannotSend) {
   for (const auto& [word, told] : std::vector<std::pair<std::string, std::string>>{
            {"DomainName=a\nHOSTNAME=evil", "byte 2 is a control character"},
            {"DomainName=\xFF", "is no UTF-8"},
-           {"Frob=1", "has no property Frob\nzorvactl: it has InstanceID"},
+           {"Frob=1", "has no property Frob\nzorvactl: zorvactl get shows those that it has"},
            {"InstanceID=x", "InstanceID is a key"},
            {"AddressOrigin=many", "a uint16 is wanted"},
            {"DomainName", "is no assignment"}}) {
@@ -272,7 +272,7 @@ TEST(Invoke, SaysWhatTheMethodTakesIfItRefuses) {
 }
 
 TEST(Invoke, GivesJson) {
-  EXPECT_EQ(json::parse(TestHost().run({"cm", kEndpoint, "SetDNSDomain", "DNSDomain=x", "-o", "json"}).out),
+  EXPECT_EQ(contentOf(TestHost().run({"cm", kEndpoint, "SetDNSDomain", "DNSDomain=x", "-o", "json"}).out),
             json::parse(R"({"return_value": 0, "output": {}})"));
 }
 

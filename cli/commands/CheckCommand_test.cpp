@@ -49,7 +49,7 @@ json checked(const TestHost& host, const Words& words, int exitCode) {
   all.insert(all.end(), words.begin(), words.end());
   const Outcome outcome = host.run(all);
   EXPECT_EQ(outcome.exitCode, exitCode) << outcome.err;
-  return json::parse(outcome.out, nullptr, false);
+  return contentOf(outcome.out);
 }
 
 TEST(Check, AsksEachServerOnceAndSaysNothingIsWrong) {

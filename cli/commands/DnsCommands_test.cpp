@@ -9,7 +9,8 @@ TEST_F(Changing, DnsCommandsChangeTheServers) {
   done(host_, {"dns", "add", "eth0", "192.0.2.2", "192.0.2.1"});
   EXPECT_EQ(done(host_, {"dns", "show", "eth0"}), "192.0.2.1\n2001:db8::1\n192.0.2.2\n");
   done(host_, {"dns", "remove", "eth0", "2001:db8::1"});
-  EXPECT_EQ(done(host_, {"dns", "show", "eth0", "-o", "json"}), "[\n  \"192.0.2.1\",\n  \"192.0.2.2\"\n]\n");
+  EXPECT_EQ(done(host_, {"dns", "show", "eth0", "-o", "json"}),
+            "{\n  \"version\": 1,\n  \"results\": [\n    \"192.0.2.1\",\n    \"192.0.2.2\"\n  ]\n}\n");
   done(host_, {"dns", "set", "eth0"});
   EXPECT_EQ(file(), wholeFileWith("192.0.2.53 2001:db8::53 ", ""));
 }
@@ -25,7 +26,7 @@ TEST_F(Changing, DnsCommandsRefuseWhatIsNoAddress) {
 }
 
 TEST_F(Changing, DnsCommandsNameTheInterfacesThereAre) {
-  expectFailed(host_, {"dns", "show", "eth7"}, 1, "interface eth7\nzorvactl: there are those of eth0, eth1");
+  expectFailed(host_, {"dns", "show", "eth7"}, 1, "interface eth7\nzorvactl: did you mean eth0?");
 }
 
 TEST(Dns, FailsIfThereIsNoFile) {

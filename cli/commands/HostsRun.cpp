@@ -4,12 +4,12 @@
 
 #include <algorithm>
 #include <atomic>
-#include <nlohmann/json.hpp>
 #include <thread>
 
 #include "cli/output/Capture.h"
 #include "cli/output/Console.h"
 #include "cli/output/Failure.h"
+#include "cli/output/JsonDocument.h"
 #include "cli/output/Progress.h"
 #include "cli/output/Terminal.h"
 #include "cli/output/Text.h"
@@ -19,8 +19,6 @@
 namespace zorva::cli {
 
 namespace {
-
-using Json = nlohmann::ordered_json;
 
 constexpr std::size_t kAtOnce = 32;
 constexpr std::chrono::seconds kReadPatience{10};
@@ -89,17 +87,18 @@ void writeTables(const std::vector<HostOutcome>& outcomes) {
   }
 }
 
-/// An array with an object for each result: "host" and "result".
+/// An object for each result: "host" and "result".
 void writeJson(const std::vector<HostOutcome>& outcomes) {
   Json rows = Json::array();
   for (const HostOutcome& outcome : outcomes) {
     // A failed command may have left a document that is not whole.
     Json document = Json::parse(outcome.text, nullptr, false);
     if (document.is_discarded()) continue;
-    if (!document.is_array()) document = Json::array({std::move(document)});
-    for (Json& result : document) rows.push_back({{"host", asUtf8(outcome.label)}, {"result", std::move(result)}});
+    document.erase("version");
+    Json results = document.contains("results") ? document["results"] : Json::array({document});
+    for (Json& result : results) rows.push_back({{"host", asUtf8(outcome.label)}, {"result", std::move(result)}});
   }
-  write(rows.dump(2) + "\n");
+  write(documentText(rows) + "\n");
 }
 
 /// What each host told, and its failure; each next step once. Returns the number of failed hosts.

@@ -54,7 +54,7 @@ TEST(IfcfgInit, MakesNoDirectoryOfAnotherName) {
 }
 
 TEST(IfcfgInit, NamesTheInterfacesThereAre) {
-  expectFailed(TestHost(), {"ifcfg", "init", "eth7"}, 1, "no interface eth7\nzorvactl: it has eth0, eth1");
+  expectFailed(TestHost(), {"ifcfg", "init", "eth7"}, 1, "no interface eth7\nzorvactl: did you mean eth0?");
 }
 
 TEST(IfcfgInit, RefusesNamesThatLeadOutOfTheDirectory) {
@@ -73,7 +73,7 @@ TEST(IfcfgShow, MarksTheLinesThatAreMissing) {
   host.directory().write("data/ifcfg-eth0", "HOSTNAME=x\nMTU=1500\n");
   EXPECT_THAT(done(host, {"ifcfg", "show", "eth0"}),
               AllOf(HasSubstr("  HOSTNAME     x\n  MTU          1500\n"), HasSubstr("  DNSSERVERS   (no such line")));
-  EXPECT_EQ(json::parse(done(host, {"ifcfg", "show", "eth0", "-o", "json"}))["lines"].size(), 2U);
+  EXPECT_EQ(contentOf(done(host, {"ifcfg", "show", "eth0", "-o", "json"}))["lines"].size(), 2U);
   expectFailed(host, {"ifcfg", "show", "eth1"}, 1, "No such file or directory\nzorvactl: zorvactl ifcfg init makes it");
 }
 
@@ -86,7 +86,7 @@ TEST(IfcfgList, MarksTheFilesWhoseInterfacesAreGone) {
   EXPECT_THAT(done(host, {"ifcfg", "list"}),
               AllOf(HasSubstr("FILE         INTERFACE        KEYS\nifcfg-eth0   eth0             BOOTPROTO HOSTNAME "),
                     HasSubstr("\nifcfg-gone0  gone: an orphan  HOSTNAME MTU\n"), HasSubstr("is no regular file")));
-  const json rows = json::parse(done(host, {"ifcfg", "list", "-o", "json"}));
+  const json rows = contentOf(done(host, {"ifcfg", "list", "-o", "json"}));
   EXPECT_EQ(rows[1]["interface"], "gone0");
   EXPECT_EQ(rows[1]["exists"], false);
   EXPECT_EQ(rows[1]["keys"], json::parse(R"(["HOSTNAME", "MTU"])"));

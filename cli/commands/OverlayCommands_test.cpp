@@ -9,7 +9,7 @@ TEST_F(Changing, OverlayClearGivesBackWhatTheHostSays) {
   EXPECT_THAT(done(host_, {"tree"}), AllOf(HasSubstr("example.org"), Not(HasSubstr("not the host's own"))));
   expectFailed(host_, {"overlay", "clear", "eth0"}, 1, "no value is set for eth0");
   EXPECT_EQ(done(host_, {"overlay", "clear"}), "0 values taken back\n");
-  EXPECT_EQ(json::parse(done(host_, {"overlay", "clear", "-o", "json"})), json::parse(R"({"cleared": 0})"));
+  EXPECT_EQ(contentOf(done(host_, {"overlay", "clear", "-o", "json"})), json::parse(R"({"cleared": 0})"));
   EXPECT_THAT(host_.run({"overlay", "show"}).err, HasSubstr("note: no value is set"));
 }
 

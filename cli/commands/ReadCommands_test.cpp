@@ -29,8 +29,15 @@ TEST(Enumerate, GivesTypedJson) {
   EXPECT_EQ(found[0]["properties"]["DNSSuffixesToAppend"], (json{"example.org", "example.net"}));
 }
 
+TEST(Enumerate, HasTheWordsOfNumbersBesideThem) {
+  const json found = jsonShown(TestHost(), {"ei", "ZORVA_DNSProtocolEndPoint"})[0];
+  EXPECT_EQ(found["words"]["EnabledState"], "Enabled");
+  EXPECT_FALSE(found["words"].contains("Hostname")) << "no word is no member";
+}
+
 TEST(Enumerate, GivesAnEmptyListIfThereIsNothing) {
-  EXPECT_EQ(shown(TestHost(), {"ei", "ZORVA_SPComputerSystem", "-o", "json"}), "[]\n");
+  EXPECT_EQ(shown(TestHost(), {"ei", "ZORVA_SPComputerSystem", "-o", "json"}),
+            "{\n  \"version\": 1,\n  \"results\": []\n}\n");
   EXPECT_EQ(shown(TestHost(), {"ei", "ZORVA_SPComputerSystem"}), "");
 }
 
@@ -54,14 +61,21 @@ TEST(Enumerate, ShowsThePropertiesThatHaveNoValue) {
     return shown(host, all);
   };
   EXPECT_THAT(as("table"), testing::ContainsRegex("  InstallDate +-\n"));
-  EXPECT_TRUE(json::parse(as("json"))[0]["properties"].at("InstallDate").is_null());
+  EXPECT_TRUE(contentOf(as("json"))[0]["properties"].at("InstallDate").is_null());
   EXPECT_THAT(as("mof"), HasSubstr("InstallDate = null;"));
   EXPECT_THAT(as("xml"), HasSubstr("<PROPERTY NAME=\"InstallDate\" TYPE=\"datetime\"></PROPERTY>"));
 }
 
 TEST(Enumerate, SaysWhichClassesAreLikeOneThatIsNot) {
   expectRefused(TestHost(), {"ei", "ZORVA_DNSProtocol"}, 2,
-                "there is no class ZORVA_DNSProtocol\nzorvactl: is it ZORVA_DNSProtocolEndPoint?\n");
+                "there is no class ZORVA_DNSProtocol\nzorvactl: did you mean ZORVA_DNSProtocolEndPoint?\n");
+  for (const auto& [typed, meant] : {std::pair("ZORVA_DNSSetingData", "ZORVA_DNSSettingData"),
+                                     std::pair("DNSOrderdComponent", "ZORVA_DNSOrderedComponent"),
+                                     std::pair("CIM_ManagedElemnt", "CIM_ManagedElement")}) {
+    expectRefused(TestHost(), {"ei", typed}, 2, std::string("zorvactl: did you mean ") + meant + "?\n");
+  }
+  expectRefused(TestHost(), {"ei", "ZORVA_DNSSettingData", "--property", "DomianName"}, 2,
+                "has a property DomianName\nzorvactl: did you mean DomainName?\n");
   expectRefused(TestHost(), {"ei", "Frob"}, 2, "there is no class Frob\nzorvactl: zorvactl classes lists them\n");
 }
 
@@ -69,7 +83,7 @@ TEST(Enumerate, ReportsAMissingProvider) {
   const TestHost host;
   const Outcome outcome = host.run({"ei", "ZORVA_DNSProtocolEndPoint", "-o", "json", "--provider-dir", "/nowhere"});
   EXPECT_EQ(outcome.exitCode, 1);
-  EXPECT_EQ(outcome.out, "[]\n") << "what a program reads is complete all the same";
+  EXPECT_THAT(contentOf(outcome.out), IsEmpty()) << "what a program reads is complete all the same";
   EXPECT_THAT(outcome.err, AllOf(HasSubstr("CIM_ERR_"), HasSubstr("libzorvadnsclientprofileprovider")));
 }
 
@@ -104,6 +118,10 @@ TEST(Get, ListsTheInstancesIfNothingFits) {
 
 TEST(Get, ReportsTheCodeOfAMissingInstance) {
   expectRefused(TestHost(), {"gi", R"(ZORVA_DNSSettingData.InstanceID="nothing")"}, 1, "CIM_ERR_NOT_FOUND (6)");
+}
+
+TEST(Get, SuggestsTheNearestKey) {
+  expectRefused(TestHost(), {"gi", R"(ZORVA_DNSProtocolEndPoint.Nmae="eth0")"}, 2, "\nzorvactl: did you mean Name?\n");
 }
 
 TEST(Get, RefusesAKeyThatTheClassLacks) {

@@ -155,11 +155,12 @@ broker::Instance settingOfInterface(Session& session, const std::string& interfa
     if (name == interface && (found == nullptr || propertyText(instance, "InstanceID").starts_with("Computer%"))) {
       found = &instance;
     }
-    if (names.size() < 20) names.push_back(printable(name));
+    names.push_back(name);
   }
   if (found != nullptr) return *found;
   throw Failure(ExitCode::Failed, "there are no DNS settings of an interface " + printable(interface),
-                names.empty() ? "this host has no interfaces" : "there are those of " + joined(names, ", "));
+                names.empty() ? "this host has no interfaces"
+                              : nearestOr(interface, names, "zorvactl show --all lists the interfaces"));
 }
 
 void changeSetting(Session& session, const Globals& globals, const broker::Instance& instance, const char* property,
@@ -169,7 +170,7 @@ void changeSetting(Session& session, const Globals& globals, const broker::Insta
   const ChangeOptions change{false, globals.dryRun};
   const broker::Instance now = changeInstance(session, instance.path, changes, change);
   if (globals.output == OutputFormat::Json) {
-    write(instanceJson(now, 0) + "\n");
+    write(instanceDocument(now) + "\n");
   } else {
     writeChanges(session, now, changes, change);
   }

@@ -1,23 +1,12 @@
 #include "cli/commands/ViewJson.h"
 
-#include <nlohmann/json.hpp>
-
 #include "broker/objects/PathText.h"
+#include "cli/output/JsonDocument.h"
 #include "cli/output/Text.h"
 
 namespace zorva::cli {
 
 namespace {
-
-using Json = nlohmann::ordered_json;
-
-std::string dumped(const Json& json) { return json.dump(2); }
-
-Json ofTexts(const std::vector<std::string>& texts) {
-  Json list = Json::array();
-  for (const std::string& text : texts) list.push_back(asUtf8(text));
-  return list;
-}
 
 Json ofClassRows(const std::vector<ClassRow>& rows) {
   Json list = Json::array();
@@ -38,7 +27,7 @@ Json ofClassRows(const std::vector<ClassRow>& rows) {
 Json ofSetting(const SettingRow& row, bool hasSources) {
   Json entry;
   entry["setting"] = row.setting;
-  entry["value"] = row.isList ? ofTexts(row.values) : Json(asUtf8(row.values.empty() ? "" : row.values.front()));
+  entry["value"] = row.isList ? jsonOfTexts(row.values) : Json(asUtf8(row.values.empty() ? "" : row.values.front()));
   if (hasSources) entry["from"] = row.source == SettingSource::None ? Json(nullptr) : Json(sourceName(row.source));
   return entry;
 }
@@ -57,8 +46,8 @@ void addFacts(Json& entry, const OwnerFacts& facts) {
   entry["dns_owner"] = orNull(facts.owner);
   entry["dns_profile"] = orNull(facts.profile);
   entry["dns_origin"] = orNull(facts.origin);
-  entry["dns_servers_in_full"] = ofTexts(facts.serversInFull);
-  entry["dns_routing_domains"] = ofTexts(facts.routingDomains);
+  entry["dns_servers_in_full"] = jsonOfTexts(facts.serversInFull);
+  entry["dns_routing_domains"] = jsonOfTexts(facts.routingDomains);
   entry["dns_default_route"] = orNull(facts.defaultRoute);
   entry["dns_over_tls"] = orNull(facts.dnsOverTls);
   entry["dnssec"] = orNull(facts.dnssec);
@@ -75,13 +64,14 @@ Json ofInterface(const InterfaceRow& row, bool hasSources) {
   entry["name"] = asUtf8(row.name);
   entry["system"] = asUtf8(row.system);
   entry["state"] = row.stateNumber ? Json(*row.stateNumber) : Json(nullptr);
+  entry["state_word"] = row.hasStateWord() ? Json(asUtf8(row.state)) : Json(nullptr);
   entry["from"] = hasSources ? orNull(row.from()) : Json(nullptr);
-  entry["servers"] = ofTexts(row.servers);
+  entry["servers"] = jsonOfTexts(row.servers);
   entry["domain_name"] = asUtf8(row.domainName);
-  entry["suffixes"] = ofTexts(row.suffixes);
+  entry["suffixes"] = jsonOfTexts(row.suffixes);
   entry["host_name"] = asUtf8(row.hostName);
   entry["endpoint_domain_name"] = asUtf8(row.endpointDomain);
-  entry["host_servers"] = row.source == SettingSource::File ? ofTexts(row.hostServers) : Json(nullptr);
+  entry["host_servers"] = row.source == SettingSource::File ? jsonOfTexts(row.hostServers) : Json(nullptr);
   addFacts(entry, row.facts);
   entry["settings"] = ofSettings(row.settings, hasSources);
   return entry;
@@ -91,14 +81,14 @@ Json ofHost(const HostRow& host, bool hasSources) {
   Json entry;
   entry["interface"] = orNull(host.interface);
   entry["place"] = orNull(host.place());
-  entry["suffixes"] = ofTexts(host.suffixes);
-  entry["dns_server_addresses"] = ofTexts(host.servers);
-  entry["dns_suffixes"] = ofTexts(host.ownSuffixes);
+  entry["suffixes"] = jsonOfTexts(host.suffixes);
+  entry["dns_server_addresses"] = jsonOfTexts(host.servers);
+  entry["dns_suffixes"] = jsonOfTexts(host.ownSuffixes);
   addFacts(entry, host.facts);
-  entry["resolver_servers"] = ofTexts(host.resolverServers);
-  entry["resolver_servers_not_asked"] = ofTexts(host.resolverNotAsked);
-  entry["resolver_search"] = ofTexts(host.resolverSearch);
-  entry["resolver_options"] = ofTexts(host.resolverOptions);
+  entry["resolver_servers"] = jsonOfTexts(host.resolverServers);
+  entry["resolver_servers_not_asked"] = jsonOfTexts(host.resolverNotAsked);
+  entry["resolver_search"] = jsonOfTexts(host.resolverSearch);
+  entry["resolver_options"] = jsonOfTexts(host.resolverOptions);
   entry["settings"] = ofSettings(host.settings, hasSources);
   return entry;
 }
@@ -111,7 +101,7 @@ std::string hostViewJson(const HostView& view) {
   json["interfaces"] =
       ofRows(view.interfaces, [&](const InterfaceRow& row) { return ofInterface(row, view.hasSources); });
   json["host"] = ofHost(view.host, view.hasSources);
-  return dumped(json);
+  return documentText(json);
 }
 
 namespace {
@@ -134,8 +124,8 @@ Json ofCheckedServer(const CheckedServer& server) {
   const bool isResponse = server.answer.kind == dns::Answer::Kind::Response;
   Json entry;
   entry["server"] = asUtf8(server.server);
-  entry["used_by"] = ofTexts(server.usedBy);
-  entry["never_asked_by"] = ofTexts(server.neverAskedBy);
+  entry["used_by"] = jsonOfTexts(server.usedBy);
+  entry["never_asked_by"] = jsonOfTexts(server.neverAskedBy);
   entry["outcome"] = outcomeWord(server.answer.kind);
   entry["code"] = isResponse ? Json(dns::codeName(server.answer.response.code)) : Json(nullptr);
   entry["time_ms"] = isResponse ? Json(static_cast<double>(server.answer.time.count()) / 1000) : Json(nullptr);
@@ -152,12 +142,12 @@ std::string checkJson(const CheckResult& result) {
   json["suffixes"] = ofRows(result.suffixes, [](const CheckedSuffix& suffix) {
     Json entry;
     entry["suffix"] = asUtf8(suffix.suffix);
-    entry["used_by"] = ofTexts(suffix.usedBy);
+    entry["used_by"] = jsonOfTexts(suffix.usedBy);
     entry["resolves"] = suffix.resolves ? Json(*suffix.resolves) : Json(nullptr);
     return entry;
   });
-  json["problems"] = ofTexts(result.problems);
-  return dumped(json);
+  json["problems"] = jsonOfTexts(result.problems);
+  return documentText(json);
 }
 
 std::string settingFileJson(const std::string& path, const std::vector<SettingLine>& lines) {
@@ -166,41 +156,42 @@ std::string settingFileJson(const std::string& path, const std::vector<SettingLi
   json["lines"] = ofRows(lines, [](const SettingLine& line) {
     return Json{{"key", asUtf8(line.key)}, {"value", asUtf8(line.value)}};
   });
-  return dumped(json);
+  return documentText(json);
 }
 
 std::string listedFilesJson(const std::vector<ListedFile>& files) {
-  return dumped(ofRows(files, [](const ListedFile& file) {
+  return documentText(ofRows(files, [](const ListedFile& file) {
     Json entry;
     entry["file"] = asUtf8(file.path);
     entry["interface"] = asUtf8(file.interface);
     entry["exists"] = !file.isOrphan;
-    entry["keys"] = ofTexts(file.keys);
+    entry["keys"] = jsonOfTexts(file.keys);
     entry["problem"] = orNull(file.problem);
     return entry;
   }));
 }
 
 std::string overlayJson(const std::vector<OverlayRow>& rows) {
-  return dumped(ofRows(rows, [](const OverlayRow& row) {
+  return documentText(ofRows(rows, [](const OverlayRow& row) {
     Json entry;
     entry["node"] = asUtf8(row.path);
     entry["property"] = row.property;
-    entry["value"] = row.isList ? ofTexts(row.values) : Json(asUtf8(row.values.empty() ? "" : row.values.front()));
+    entry["value"] = row.isList ? jsonOfTexts(row.values) : Json(asUtf8(row.values.empty() ? "" : row.values.front()));
     return entry;
   }));
 }
 
-std::string countJson(const char* name, std::size_t count) { return dumped(Json{{name, count}}); }
+std::string countJson(const char* name, std::size_t count) { return documentText(Json{{name, count}}); }
 
 std::string applyResultsJson(const std::vector<zorva::agent::ApplyResult>& results) {
-  return dumped(ofRows(results, [](const zorva::agent::ApplyResult& result) {
+  return documentText(ofRows(results, [](const zorva::agent::ApplyResult& result) {
     Json entry;
     entry["interface"] = asUtf8(result.interface);
     entry["owner"] = asUtf8(result.owner);
     entry["profile"] = asUtf8(result.profile);
     entry["changes"] = ofRows(result.changes, [](const zorva::agent::PropertyChange& change) {
-      return Json{{"property", change.property}, {"before", ofTexts(change.before)}, {"after", ofTexts(change.after)}};
+      return Json{
+          {"property", change.property}, {"before", jsonOfTexts(change.before)}, {"after", jsonOfTexts(change.after)}};
     });
     if (!result.problem.empty()) entry["problem"] = asUtf8(result.problem);
     if (!result.note.empty()) entry["note"] = asUtf8(result.note);
@@ -222,23 +213,23 @@ std::string graphJson(const Graph& graph) {
     for (const GraphEnd* end : {&each.from, &each.to}) entry[end->role] = end->object;
     return entry;
   });
-  return dumped(json);
+  return documentText(json);
 }
 
 std::string usersJson(const std::vector<const access::User*>& users) {
-  return dumped(ofRows(users, [](const access::User* user) {
+  return documentText(ofRows(users, [](const access::User* user) {
     Json entry;
     entry["name"] = user->name;
     entry["role"] = access::wordOf(user->grants.everywhere());
     entry["namespaces"] = Json::object();
     for (const auto& [name, role] : user->grants.byNameSpace()) entry["namespaces"][name] = access::wordOf(role);
     entry["has_password"] = user->hash != access::kNoPassword;
-    entry["fingerprints"] = ofTexts(user->fingerprints);
+    entry["fingerprints"] = jsonOfTexts(user->fingerprints);
     entry["subject"] = orNull(user->subject);
     return entry;
   }));
 }
 
-std::string classRowsJson(const std::vector<ClassRow>& rows) { return dumped(ofClassRows(rows)); }
+std::string classRowsJson(const std::vector<ClassRow>& rows) { return documentText(ofClassRows(rows)); }
 
 }  // namespace zorva::cli

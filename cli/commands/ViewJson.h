@@ -1,7 +1,6 @@
 #pragma once
 
-// JSON documents (RFC 8259) of the views that commands make of what they read; laid out as those of
-// output/JsonOutput.h.
+// JSON documents (RFC 8259) of the views that commands make of what they read (output/JsonDocument.h).
 
 #include <string>
 #include <vector>

@@ -1,18 +1,13 @@
 #include "cli/output/JsonOutput.h"
 
-#include <nlohmann/json.hpp>
-
 #include "broker/objects/PathText.h"
+#include "cli/output/JsonDocument.h"
 #include "cli/output/Text.h"
 #include "cli/output/ValueText.h"
 
 namespace zorva::cli {
 
 namespace {
-
-using Json = nlohmann::ordered_json;
-
-std::string dumped(const Json& json) { return json.dump(2); }
 
 Json ofScalar(const broker::Scalar& scalar) {
   if (const auto* value = std::get_if<bool>(&scalar)) return *value;
@@ -35,15 +30,24 @@ Json ofValue(const broker::Value& value) {
   return list;
 }
 
-Json ofTexts(const std::vector<std::string>& texts) {
-  Json list = Json::array();
-  for (const std::string& text : texts) list.push_back(asUtf8(text));
-  return list;
+/// The word that the class has for a number, or for each of several; null where it has none.
+Json wordsOf(const broker::Property& property) {
+  if (property.declaration == nullptr || property.value.isNull) return nullptr;
+  const auto wordOf = [&property](const broker::Scalar& scalar) {
+    const auto word = scalarWord(scalar, *property.declaration);
+    return word ? Json(asUtf8(*word)) : Json(nullptr);
+  };
+  if (!property.value.isArray) return wordOf(property.value.scalar);
+  Json words = Json::array();
+  bool hasOne = false;
+  for (const broker::Scalar& element : property.value.elements) {
+    words.push_back(wordOf(element));
+    hasOne = hasOne || !words.back().is_null();
+  }
+  return hasOne ? words : Json(nullptr);
 }
 
-}  // namespace
-
-std::string instanceJson(const broker::Instance& instance, std::size_t depth) {
+Json ofInstance(const broker::Instance& instance) {
   Json json;
   json["class"] = instance.path.className;
   json["path"] = asUtf8(broker::pathText(instance.path));
@@ -51,7 +55,19 @@ std::string instanceJson(const broker::Instance& instance, std::size_t depth) {
   for (const broker::Property& property : instance.properties) {
     json["properties"][property.name] = ofValue(property.value);
   }
-  const std::string text = dumped(json);
+  json["words"] = Json::object();
+  for (const broker::Property& property : instance.properties) {
+    if (Json words = wordsOf(property); !words.is_null()) json["words"][property.name] = std::move(words);
+  }
+  return json;
+}
+
+}  // namespace
+
+std::string instanceDocument(const broker::Instance& instance) { return documentText(ofInstance(instance)); }
+
+std::string instanceJson(const broker::Instance& instance, std::size_t depth) {
+  const std::string text = ofInstance(instance).dump(2);
   std::string shifted;
   for (const char c : text) {
     shifted += c;
@@ -60,14 +76,14 @@ std::string instanceJson(const broker::Instance& instance, std::size_t depth) {
   return shifted;
 }
 
-std::string pathJson(const broker::ObjectPath& path) { return dumped(asUtf8(broker::pathText(path))); }
+std::string pathJson(const broker::ObjectPath& path) { return Json(asUtf8(broker::pathText(path))).dump(); }
 
 std::string methodResultJson(const broker::MethodResult& result) {
   Json json;
   json["return_value"] = ofValue(result.returnValue);
   json["output"] = Json::object();
   for (const broker::NamedValue& output : result.output) json["output"][output.name] = ofValue(output.value);
-  return dumped(json);
+  return documentText(json);
 }
 
 std::string methodCallJson(const broker::ObjectPath& path, const std::string& method,
@@ -77,9 +93,9 @@ std::string methodCallJson(const broker::ObjectPath& path, const std::string& me
   json["method"] = method;
   json["input"] = Json::object();
   for (const broker::NamedValue& each : input) json["input"][each.name] = ofValue(each.value);
-  return dumped(json);
+  return documentText(json);
 }
 
-std::string textsJson(const std::vector<std::string>& texts) { return dumped(ofTexts(texts)); }
+std::string textsJson(const std::vector<std::string>& texts) { return documentText(jsonOfTexts(texts)); }
 
 }  // namespace zorva::cli

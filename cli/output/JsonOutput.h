@@ -1,7 +1,7 @@
 #pragma once
 
-// JSON documents (RFC 8259) of what CIM operations give. Each text is indented by two blanks and has no line feed at
-// its end. Bytes that are no UTF-8 come out as asUtf8() has them.
+// JSON (RFC 8259) of what CIM operations give: documents (JsonDocument.h), and the elements of lists that are written
+// one by one. Bytes that are no UTF-8 come out as asUtf8() has them.
 
 #include <cstddef>
 #include <string>
@@ -11,9 +11,13 @@
 
 namespace zorva::cli {
 
-/// An instance as an object: "class", "path", and "properties" in the order in which they were set. A null property is
-/// null, a reference is the text of its path. `depth` is the indent in blanks of the lines after the first.
+/// An instance as an object: "class", "path", "properties" in the order in which they were set, and "words": those that
+/// the class has for numbers, under the names of their properties. A null property is null, a reference is the text of
+/// its path. `depth` is the indent in blanks of the lines after the first.
 std::string instanceJson(const broker::Instance& instance, std::size_t depth);
+
+/// One instance as a document.
+std::string instanceDocument(const broker::Instance& instance);
 
 /// A path's text as a JSON string.
 std::string pathJson(const broker::ObjectPath& path);

@@ -42,6 +42,33 @@ TEST(JsonOutput, HasAJsonTypeForEachType) {
   EXPECT_EQ(jsonOf(Value::reference({"", "n", "D", {}})), "n:D");
 }
 
+TEST(JsonOutput, HasAWordForEachElementOfAnArrayThatHasOne) {
+  schema::ClassProperty declared;
+  for (const auto& [name, texts] :
+       {std::pair("ValueMap", std::vector<schema::Scalar>{std::string("2"), std::string("5..9")}),
+        std::pair("Values", std::vector<schema::Scalar>{std::string("OK"), std::string("Bad")})}) {
+    schema::Qualifier qualifier;
+    qualifier.name = name;
+    qualifier.value = schema::Value::array(texts);
+    declared.qualifiers.push_back(qualifier);
+  }
+  const auto numbers = [](std::vector<Scalar> list) { return Value::array(schema::Type::Uint16, std::move(list)); };
+  const auto wordsOf = [&declared](const Value& value) {
+    return nlohmann::json::parse(instanceDocument(instanceOf({{"P", value, &declared}})))["words"];
+  };
+  const auto number = [](std::uint64_t value) { return Scalar(value); };
+  EXPECT_EQ(wordsOf(numbers({number(2), number(7), number(3)})),
+            nlohmann::json::parse(R"({"P": ["OK", "Bad", null]})"));
+  EXPECT_EQ(wordsOf(numbers({number(3)})), nlohmann::json::object());
+  EXPECT_EQ(wordsOf(Value::unsignedNumber(2)), nlohmann::json::parse(R"({"P": "OK"})"));
+  EXPECT_EQ(wordsOf(Value::unsignedNumber(3)), nlohmann::json::object());
+}
+
+TEST(JsonOutput, IsADocumentWithItsVersionFirst) {
+  EXPECT_TRUE(instanceDocument(instanceOf({})).starts_with("{\n  \"version\": 1,\n  \"class\": \"C\""));
+  EXPECT_EQ(textsJson({"a"}), "{\n  \"version\": 1,\n  \"results\": [\n    \"a\"\n  ]\n}");
+}
+
 TEST(JsonOutput, IsUtf8WhateverTheValuesAre) { EXPECT_EQ(jsonOf(Value::text("a\xFF")), "a\xF4\x8E\xBB\xBF"); }
 
 TEST(JsonOutput, KeepsTheOrderOfTheProperties) {

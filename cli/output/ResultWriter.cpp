@@ -5,6 +5,7 @@
 #include "cimxml/ElementWriter.h"
 #include "cli/output/Console.h"
 #include "cli/output/Failure.h"
+#include "cli/output/JsonDocument.h"
 #include "cli/output/JsonOutput.h"
 #include "cli/output/MofOutput.h"
 #include "cli/output/Text.h"
@@ -60,27 +61,31 @@ class RowsWriter : public ResultWriter {
   Table table_;
 };
 
+/// A single instance, or a document whose list is written while it comes.
 class JsonWriter : public ResultWriter {
  public:
   explicit JsonWriter(Count count) : count_(count) {}
 
-  void add(const broker::Instance& instance) override { addText(instanceJson(instance, isList() ? 2 : 0)); }
+  void add(const broker::Instance& instance) override {
+    if (count_ == Count::One) return write(instanceDocument(instance) + "\n");
+    addText(instanceJson(instance, 4));
+  }
   void add(const broker::ObjectPath& path) override { addText(pathJson(path)); }
 
   void finish() override {
-    if (isList()) write(any_ ? "\n]\n" : "[]\n");
-    if (!isList() && any_) write("\n");
+    if (count_ == Count::One) return;
+    if (!any_) write(begin_);
+    write(any_ ? "\n  ]\n}\n" : "]\n}\n");
   }
 
  private:
-  bool isList() const noexcept { return count_ == Count::Many; }
-
   void addText(const std::string& text) {
-    if (isList()) write(any_ ? ",\n  " : "[\n  ");
+    write(any_ ? std::string(",") : begin_);
     any_ = true;
-    write(text);
+    write("\n    " + text);
   }
 
+  const std::string begin_ = "{\n  \"version\": " + std::to_string(kJsonVersion) + ",\n  \"results\": [";
   Count count_;
   bool any_ = false;
 };

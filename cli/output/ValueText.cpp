@@ -66,9 +66,8 @@ std::optional<std::int64_t> wholeNumber(const broker::Scalar& scalar) {
 
 std::string elementText(const broker::Scalar& scalar, const schema::ClassProperty* declaration) {
   std::string text = scalarText(scalar);
-  const std::optional<std::int64_t> number = wholeNumber(scalar);
-  if (declaration == nullptr || !number) return text;
-  if (const std::optional<std::string> word = valueWord(*declaration, *number)) text += " (" + *word + ")";
+  if (declaration == nullptr) return text;
+  if (const std::optional<std::string> word = scalarWord(scalar, *declaration)) text += " (" + *word + ")";
   return text;
 }
 
@@ -86,6 +85,11 @@ std::optional<std::string> valueWord(const schema::ClassProperty& declaration, s
     if (entry != nullptr && word != nullptr && holds(*entry, number)) return *word;
   }
   return std::nullopt;
+}
+
+std::optional<std::string> scalarWord(const broker::Scalar& scalar, const schema::ClassProperty& declaration) {
+  const std::optional<std::int64_t> number = wholeNumber(scalar);
+  return number ? valueWord(declaration, *number) : std::nullopt;
 }
 
 std::string valueText(const broker::Value& value, const schema::ClassProperty* declaration) {

@@ -21,6 +21,9 @@ std::string valueText(const broker::Value& value, const schema::ClassProperty* d
 /// The word that the property's qualifiers have for a number.
 std::optional<std::string> valueWord(const schema::ClassProperty& declaration, std::int64_t number);
 
+/// The same for a value of the property; nothing if it is no number.
+std::optional<std::string> scalarWord(const broker::Scalar& scalar, const schema::ClassProperty& declaration);
+
 /// A path as a person would type it: without the host, and without the default namespace.
 std::string shortPathText(const broker::ObjectPath& path);
 

@@ -54,7 +54,7 @@ struct InterfaceRow {
   std::string system;
   bool isServiceProcessor = false;
   std::optional<std::uint64_t> stateNumber;
-  std::string state;  ///< "Enabled"
+  std::string state;  ///< "Enabled"; the number as text if the class has no word for it
   std::string hostName;
   std::string endpointDomain;  ///< of the endpoint, which does not read the interface's file
   std::vector<std::string> servers;
@@ -69,6 +69,8 @@ struct InterfaceRow {
   /// Whether it has servers or domains of its own, or something was set for it. The domain alone does not count: it may
   /// be the host's.
   bool hasDns() const;
+
+  bool hasStateWord() const { return stateNumber && state != std::to_string(*stateNumber); }
 
   /// "NetworkManager, profile lan", "ifcfg-eth0", "/etc/resolv.conf"; empty if nothing supplies values.
   std::string from() const;

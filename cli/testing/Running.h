@@ -40,9 +40,20 @@ inline std::string shown(const TestHost& host, const Words& words) {
   return outcome.out;
 }
 
+/// What a JSON document says: its list of results, or its members; without the version, which it must have.
+inline json contentOf(const std::string& text) {
+  json document = json::parse(text, nullptr, false);
+  if (!document.is_object() || document.value("version", 0) != 1) {
+    ADD_FAILURE() << "no document: " << text;
+    return {};
+  }
+  document.erase("version");
+  return document.contains("results") ? document["results"] : document;
+}
+
 inline json jsonShown(const TestHost& host, Words words) {
   words.insert(words.end(), {"--output", "json"});
-  return json::parse(shown(host, words));
+  return contentOf(shown(host, words));
 }
 
 /// Checks that a run ends with this exit code and this message, without standard output.
