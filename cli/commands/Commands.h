@@ -26,6 +26,7 @@ void addSuffixesCommands(CommandLine& line);
 void addOverlayCommands(CommandLine& line);
 void addApplyCommands(CommandLine& line);
 void addUserCommands(CommandLine& line);
+void addRegisterCommands(CommandLine& line);
 void addCompletionCommands(CommandLine& line);
 
 }  // namespace zorva::cli
