@@ -3,6 +3,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <cctype>
 #include <cstdlib>
 #include <filesystem>
 #include <sstream>
@@ -42,6 +43,18 @@ struct OtherServer {
   std::vector<std::string> (*steps)(const RegisterOptions& options);
 };
 
+/// A path as a word of a shell.
+std::string shellWord(const std::string& path) {
+  const bool isPlain = std::all_of(path.begin(), path.end(), [](char c) {
+    return std::isalnum(static_cast<unsigned char>(c)) != 0 ||
+           std::string_view("/._-+").find(c) != std::string_view::npos;
+  });
+  if (isPlain) return path;
+  std::string word = "'";
+  for (const char c : path) word += c == '\'' ? std::string("'\\''") : std::string(1, c);
+  return word + "'";
+}
+
 // ---- The Small Footprint CIM Broker ----
 
 std::string sfcbText() { return sfcbRegistration(ProviderRegistry::builtIn(), kOwnMark); }
@@ -66,8 +79,8 @@ std::vector<Placed> sfcbFiles(const std::string& staging) {
 }
 
 std::vector<std::string> sfcbSteps(const RegisterOptions& options) {
-  std::string rebuild = "sfcbrepos -f -s " + options.staging;
-  if (!options.repository.empty()) rebuild += " -r " + options.repository;
+  std::string rebuild = "sfcbrepos -f -s " + shellWord(options.staging);
+  if (!options.repository.empty()) rebuild += " -r " + shellWord(options.repository);
   return {rebuild, "systemctl restart sblim-sfcb"};
 }
 
@@ -89,11 +102,11 @@ std::vector<std::string> pegasusSteps(const RegisterOptions& options) {
     }
     return steps;
   }
-  const std::string compile = options.repository.empty() ? "cimmof" : "cimmofl -R" + options.repository;
+  const std::string compile = options.repository.empty() ? "cimmof" : "cimmofl -R" + shellWord(options.repository);
   for (const std::string& nameSpace : nameSpacesOf(ProviderRegistry::builtIn())) {
-    steps.push_back(compile + " -n" + nameSpace + " " + options.staging + "/zorva.mof");
+    steps.push_back(compile + " -n" + nameSpace + " " + shellWord(options.staging + "/zorva.mof"));
   }
-  steps.push_back(compile + " -nroot/PG_InterOp " + options.staging + "/zorva-pegasus.mof");
+  steps.push_back(compile + " -nroot/PG_InterOp " + shellWord(options.staging + "/zorva-pegasus.mof"));
   if (!options.repository.empty()) steps.emplace_back("systemctl restart tog-pegasus");
   return steps;
 }
@@ -171,7 +184,8 @@ bool isInPath(const std::string& program) {
 
 /// What a person does next; a program that is not found here is marked.
 std::string nextSteps(const OtherServer& server, const RegisterOptions& options) {
-  std::string text = std::string("Then, as root, so that ") + server.name + " reads it:\n";
+  std::string text =
+      std::string("Then, as root, so that ") + server.name + (options.remove ? " forgets it:\n" : " reads it:\n");
   for (const std::string& step : server.steps(options)) {
     const std::string program = step.substr(0, step.find(' '));
     text += "  " + printable(step) + (isInPath(program) ? "" : "    (" + program + " is not in PATH here)") + "\n";

@@ -271,6 +271,13 @@ TEST_F(Register, NamesTheCommandsOfPegasusAndMarksThoseThatAreNotHere) {
   EXPECT_THAT(present(), IsEmpty());
 }
 
+TEST_F(Register, ItsCommandsCanBePastedWhateverThePathsAre) {
+  fs::create_directory(at("it's here"));
+  const std::string out =
+      shown(host_, {"register", "sfcb", "--staging", at("it's here"), "--library-dir", at("lib"), "--dry-run"});
+  EXPECT_THAT(out, HasSubstr("  sfcbrepos -f -s '" + at("it'\\''s here") + "'"));
+}
+
 TEST_F(Register, ADryRunChangesNothing) {
   EXPECT_THAT(shown(host_, words("sfcb", {"--dry-run"})), HasSubstr("would be put  " + at("stage/regs/zorva.reg")));
   EXPECT_THAT(present(), IsEmpty());
