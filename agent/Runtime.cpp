@@ -10,6 +10,7 @@
 #include "agent/apply/Apply.h"
 #include "agent/config/CurrentConfig.h"
 #include "agent/log/LogOutput.h"
+#include "agent/sources/BmcSource.h"
 #include "agent/sources/FileSource.h"
 #include "agent/sources/HostSource.h"
 #include "util/HostName.h"
@@ -17,11 +18,17 @@
 namespace zorva::agent {
 namespace {
 
-std::shared_ptr<TreeSource> makeSource(const Config& config) {
+std::shared_ptr<TreeSource> makeSourceOfHost(const Config& config) {
   if (config.source == "file") return std::make_shared<FileSource>(config.treeFile);
   HostSourceOptions options;
   options.includeLoopback = config.includeLoopback;
   return std::make_shared<HostSource>(options);
+}
+
+std::shared_ptr<TreeSource> makeSource(const Config& config) {
+  std::shared_ptr<TreeSource> host = makeSourceOfHost(config);
+  if (config.bmc.file.empty()) return host;
+  return std::make_shared<BmcSource>(std::move(host), config.bmc.file);
 }
 
 }  // namespace

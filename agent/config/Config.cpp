@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <cerrno>
 
+#include "util/Names.h"
 #include "util/ReadFile.h"
 #include "util/Toml.h"
 
@@ -72,14 +73,57 @@ void readLog(Config& config, const util::TomlDocument& document) {
   log.finish();
 }
 
+// A fingerprint as programs print it, with or without colons.
+std::string settledFingerprint(const std::string& text) {
+  std::string digits;
+  for (const char c : text) {
+    if (c != ':') digits += util::lowerAscii(c);
+  }
+  return digits;
+}
+
+void readBmc(BmcConfig& bmc, const Config& config, const util::TomlDocument& document) {
+  constexpr std::size_t kDigits = 64;
+  constexpr std::string_view kScheme = "https://";
+  util::TomlTable table(document, "bmc");
+  table.take("url", bmc.url);
+  if (!bmc.url.empty() && (!bmc.url.starts_with(kScheme) || bmc.url.size() == kScheme.size())) {
+    table.fail("url", "expected https://HOST or https://HOST:PORT");
+  }
+  if (bmc.url.find('@') != std::string::npos) table.fail("url", "must not hold a login; user and password_file do");
+  if (bmc.url.ends_with('/')) bmc.url.pop_back();
+  if (bmc.url.find_first_of("/?#\\ ", kScheme.size()) != std::string::npos) table.fail("url", "must not hold a path");
+  table.take("user", bmc.user);
+  table.take("password_file", bmc.passwordFile);
+  if (!bmc.url.empty() && bmc.user.empty()) table.fail("url", "needs user and password_file as well");
+  if (bmc.user.empty() != bmc.passwordFile.empty()) table.fail("user", "and password_file need each other");
+  table.take("ca_file", bmc.caFile);
+  table.take("fingerprint", bmc.fingerprint);
+  bmc.fingerprint = settledFingerprint(bmc.fingerprint);
+  const bool isHex = bmc.fingerprint.find_first_not_of("0123456789abcdef") == std::string::npos;
+  if (!bmc.fingerprint.empty() && (!isHex || bmc.fingerprint.size() != kDigits)) {
+    table.fail("fingerprint", "expected the SHA-256 of a certificate: 64 hexadecimal digits");
+  }
+  if (!bmc.fingerprint.empty() && !bmc.caFile.empty()) table.fail("fingerprint", "and ca_file exclude each other");
+  constexpr int kLongestInterval = 86400;
+  table.take("interval", bmc.interval, 5, kLongestInterval);
+  if (config.source == "host") bmc.file = kDefaultBmcFile;
+  table.take("file", bmc.file);
+  for (std::string* path : {&bmc.passwordFile, &bmc.caFile, &bmc.file}) {
+    if (!path->empty()) *path = util::pathFrom(config.file, *path);
+  }
+  table.finish();
+}
+
 Config parseConfig(const std::string& path, const std::string& text) try {
   const util::TomlDocument document(text);
-  document.refuseAllBut({"agent", "tree", "log"});
+  document.refuseAllBut({"agent", "tree", "log", "bmc"});
   Config config;
   config.file = path;
   readAgent(config, document);
   readTree(config, document);
   readLog(config, document);
+  readBmc(config.bmc, config, document);
   return config;
 } catch (const util::TomlError& error) {
   throw ConfigError(path, error.line(), error.key(), error.what());
@@ -99,7 +143,7 @@ Config readDefaultConfig() {
   const char* named = ::secure_getenv("ZORVAGENT_CONFIG");
   if (named != nullptr && *named != '\0') return readConfig(named);
   const bool absent = ::access(kDefaultFile, F_OK) != 0 && errno == ENOENT;
-  return absent ? Config() : readConfig(kDefaultFile);
+  return absent ? parseConfig({}, {}) : readConfig(kDefaultFile);
 }
 
 }  // namespace zorva::agent

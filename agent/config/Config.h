@@ -34,6 +34,20 @@ class ZORVA_AGENT_API ConfigError : public std::runtime_error {
 /// The default directory for values that were set.
 inline constexpr const char* kDefaultDataDir = "/var/lib/zorvagent/";
 
+/// [bmc]: the service processor that zorva-bmc asks.
+struct BmcConfig {
+  std::string url;           ///< "https://HOST[:PORT]"; empty: the one that the firmware names
+  std::string user;          ///< empty: an account that the service processor makes for this host
+  std::string passwordFile;  ///< whose first line is the password
+  std::string caFile;        ///< with the authorities that its certificate is checked against; empty: the system's
+  std::string fingerprint;   ///< SHA-256 of its certificate: 64 lower-case hexadecimal digits; empty: not compared
+  int interval = 60;         ///< seconds from one reading to the next
+  std::string file;          ///< what was read; empty: no service processor is in the tree
+};
+
+/// The default place of what zorva-bmc read.
+inline constexpr const char* kDefaultBmcFile = "/run/zorvagent/bmc.json";
+
 /// Relative paths start at the directory of the configuration's file.
 struct Config {
   std::string file;  ///< the file; empty for the built-in defaults
@@ -54,6 +68,8 @@ struct Config {
   std::string logTarget = "stderr";
   int traceLevel = util::kLevelError;
   std::string traceTarget = "off";
+
+  BmcConfig bmc;
 };
 
 /// Reads and checks a configuration (TOML 1.0). Throws ConfigError for whatever is wrong with it, a file that cannot be

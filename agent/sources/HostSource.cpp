@@ -2,12 +2,12 @@
 
 #include <linux/if.h>
 
-#include <algorithm>
 #include <unordered_map>
 #include <unordered_set>
 #include <utility>
 
 #include "agent/sources/DnsProperties.h"
+#include "agent/tree/IpAddress.h"
 #include "util/HostName.h"
 #include "util/ReadFile.h"
 #include "util/Text.h"
@@ -21,36 +21,13 @@ constexpr std::size_t kLargestFile = std::size_t{64} << 10;
 constexpr const char* kComputer = "Computer";
 constexpr const char* kResolvConf = "/etc/resolv.conf";
 
-// Raw enabled states, as in PROP_ENABLED_STATE.
-constexpr unsigned int kUpWithCarrier = 1;
-constexpr unsigned int kUpWithoutCarrier = 12;
-constexpr unsigned int kDown = 16;
-
-// CIM's ProtocolIFType.
-constexpr unsigned int kOther = 1;
-constexpr unsigned int kIPv4 = 4096;
-constexpr unsigned int kIPv6 = 4097;
-constexpr unsigned int kBoth = 4098;
-
 unsigned int enabledState(const Link& link) {
-  if ((link.flags & IFF_UP) == 0) return kDown;
+  if ((link.flags & IFF_UP) == 0) return kRawDown;
   // A driver that does not report its operational state, for example that of a tunnel, still reports whether the lower
   // layer is up.
   const bool carrier =
       link.operState == IF_OPER_UP || (link.operState == IF_OPER_UNKNOWN && (link.flags & IFF_LOWER_UP) != 0);
-  return carrier ? kUpWithCarrier : kUpWithoutCarrier;
-}
-
-unsigned int protocolType(const AddressList& addresses) {
-  const auto has = [&addresses](AddressFamily family) {
-    return std::any_of(addresses.begin(), addresses.end(),
-                       [family](const InterfaceAddress& address) { return address.family() == family; });
-  };
-  const bool ipv4 = has(AddressFamily::IPv4);
-  const bool ipv6 = has(AddressFamily::IPv6);
-  if (ipv4 && ipv6) return kBoth;
-  if (!ipv4 && !ipv6) return kOther;
-  return ipv4 ? kIPv4 : kIPv6;
+  return carrier ? kRawUpWithCarrier : kRawUpWithoutCarrier;
 }
 
 using AddressesOfLinks = std::unordered_map<int, AddressList>;
@@ -129,7 +106,7 @@ std::shared_ptr<const TreeSnapshot> HostSource::read() {
 
 void HostSource::setLink(TreeBuilder& builder, std::size_t node, const Link& link, AddressList addresses) {
   builder.set(node, PROP_NAME, link.name);
-  builder.set(node, PROP_PROTOCOL_IF_TYPE, protocolType(addresses));
+  builder.set(node, PROP_PROTOCOL_IF_TYPE, protocolTypeOf(addresses));
   builder.set(node, PROP_ENABLED_STATE, enabledState(link));
   builder.set(node, kAddresses, std::make_shared<const AddressList>(std::move(addresses)));
 }

@@ -2,6 +2,7 @@
 
 #include <arpa/inet.h>
 
+#include <algorithm>
 #include <array>
 
 namespace zorva::agent {
@@ -38,6 +39,22 @@ std::vector<unsigned char> bytesOfAddress(const std::string& text) {
   if (parse(AF_INET6, text, bytes)) return bytes;
   bytes.resize(sizeof(in_addr));
   return parse(AF_INET, text, bytes) ? bytes : std::vector<unsigned char>();
+}
+
+unsigned int protocolTypeOf(const AddressList& addresses) {
+  constexpr unsigned int kOther = 1;
+  constexpr unsigned int kIPv4 = 4096;
+  constexpr unsigned int kIPv6 = 4097;
+  constexpr unsigned int kBoth = 4098;
+  const auto has = [&addresses](AddressFamily family) {
+    return std::any_of(addresses.begin(), addresses.end(),
+                       [family](const InterfaceAddress& address) { return address.family() == family; });
+  };
+  const bool ipv4 = has(AddressFamily::IPv4);
+  const bool ipv6 = has(AddressFamily::IPv6);
+  if (ipv4 && ipv6) return kBoth;
+  if (!ipv4 && !ipv6) return kOther;
+  return ipv4 ? kIPv4 : kIPv6;
 }
 
 }  // namespace zorva::agent

@@ -5,6 +5,8 @@
 #include <string>
 #include <vector>
 
+#include "agent/tree/Node.h"
+
 namespace zorva::agent {
 
 /// Whether the whole text is an address for inet_pton; without a zone.
@@ -18,5 +20,8 @@ bool isIPv6LinkLocal(const std::string& text);
 // text is no address.
 std::string textOfAddress(const std::vector<unsigned char>& address);
 std::vector<unsigned char> bytesOfAddress(const std::string& text);
+
+// CIM's ProtocolIFType: 4096 IPv4, 4097 IPv6, 4098 both, 1 if there are none.
+unsigned int protocolTypeOf(const AddressList& addresses);
 
 }  // namespace zorva::agent

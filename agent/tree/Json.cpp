@@ -94,7 +94,8 @@ class LineCounter {
 // Builds the value while the parser runs. The parser itself needs no stack for nested values.
 class Builder : public nlohmann::json_sax<nlohmann::json> {
  public:
-  Builder(const std::string& name, LineCounter& lines) : name_(name), lines_(lines) {}
+  Builder(const std::string& name, LineCounter& lines, std::size_t mostValues)
+      : name_(name), lines_(lines), mostValues_(mostValues) {}
 
   JsonValue take() { return std::move(root_); }
 
@@ -153,8 +154,8 @@ class Builder : public nlohmann::json_sax<nlohmann::json> {
     JsonValue& value = open_.empty() ? root_ : open_.back()->items.emplace_back();
     value.kind = kind;
     value.line = lines_.line();
-    if (++values_ > kMostJsonValues) {
-      throw ConfigError(name_, value.line, {}, "has more than " + std::to_string(kMostJsonValues) + " values");
+    if (++values_ > mostValues_) {
+      throw ConfigError(name_, value.line, {}, "has more than " + std::to_string(mostValues_) + " values");
     }
     return value;
   }
@@ -180,6 +181,7 @@ class Builder : public nlohmann::json_sax<nlohmann::json> {
 
   const std::string& name_;
   LineCounter& lines_;
+  std::size_t mostValues_;
   std::size_t values_ = 0;
   JsonValue root_;
   // The lists and objects that are open. A pointer into items stays valid, because only the innermost one grows.
@@ -248,6 +250,13 @@ JsonValue JsonValue::ofNumber(std::uint64_t number) {
   return value;
 }
 
+JsonValue JsonValue::ofBoolean(bool boolean) {
+  JsonValue value;
+  value.kind = Kind::Boolean;
+  value.boolean = boolean;
+  return value;
+}
+
 JsonValue JsonValue::list() {
   JsonValue value;
   value.kind = Kind::List;
@@ -272,10 +281,10 @@ const JsonValue* JsonValue::find(std::string_view key) const {
   return found == keys.end() ? nullptr : &items[static_cast<std::size_t>(found - keys.begin())];
 }
 
-JsonValue parseJson(const std::string& text, const std::string& name) {
+JsonValue parseJson(const std::string& text, const std::string& name, std::size_t mostValues) {
   if (text.size() > kLargestJson) throw ConfigError(name, 0, {}, "is larger than 64 MiB");
   LineCounter lines(text);
-  Builder builder(name, lines);
+  Builder builder(name, lines, mostValues);
   const TrackingIterator begin(text.data(), lines.reached());
   const TrackingIterator end(text.data() + text.size(), lines.reached());
   nlohmann::json::sax_parse(begin, end, &builder);

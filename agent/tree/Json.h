@@ -28,6 +28,7 @@ struct JsonValue {
 
   static JsonValue ofText(std::string text);
   static JsonValue ofNumber(std::uint64_t number);
+  static JsonValue ofBoolean(bool boolean);
   static JsonValue list();
   static JsonValue object();
 
@@ -45,9 +46,9 @@ inline constexpr std::size_t kLargestJson = std::size_t{64} << 20;
 inline constexpr std::size_t kMostJsonValues = 1000000;
 inline constexpr std::size_t kDeepestJson = 32;
 
-/// Reads a document; name is its name in errors. Throws ConfigError if it is not JSON, too large or too deep, or if an
-/// object has a name twice.
-JsonValue parseJson(const std::string& text, const std::string& name);
+/// Reads a document; name is its name in errors. Throws ConfigError if it is not JSON, too large or too deep, has more
+/// values, or if an object has a name twice.
+JsonValue parseJson(const std::string& text, const std::string& name, std::size_t mostValues = kMostJsonValues);
 
 /// Reads the document in a file. Throws ConfigError as parseJson does, and if the file cannot be read.
 JsonValue readJsonFile(const std::string& path);

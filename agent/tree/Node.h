@@ -45,6 +45,19 @@ inline constexpr PropertyNumber kResolverNotAsked = 0x1000D;  ///< list: servers
 inline constexpr PropertyNumber kResolverSearch = 0x1000E;    ///< list
 inline constexpr PropertyNumber kResolverOptions = 0x1000F;   ///< list: "ndots:2", "rotate"
 
+/// About what was read from a service processor, on its system's node.
+inline constexpr PropertyNumber kReadAt = 0x10010;        ///< number: seconds since 1970
+inline constexpr PropertyNumber kReadInterval = 0x10011;  ///< number: seconds from one reading to the next
+inline constexpr PropertyNumber kReadProblem = 0x10012;   ///< text: why the latest reading failed
+
+/// Raw enabled states, as in PROP_ENABLED_STATE.
+inline constexpr unsigned int kRawUpWithCarrier = 1;
+inline constexpr unsigned int kRawUpWithoutCarrier = 12;
+inline constexpr unsigned int kRawDown = 16;
+
+/// The owner of the DNS settings of a service processor's interfaces.
+inline constexpr const char* kBmcOwner = "BMC";
+
 /// The origin of an address, from the kernel's flags and protocol of the address.
 enum class AddressOrigin : std::uint8_t { Unknown, Static, Dhcp, Slaac, LinkLocal };
 

@@ -62,6 +62,9 @@ constexpr std::array kProperties{
     PropertyName{kResolverNotAsked, "resolver_servers_not_asked", ValueType::TextList},
     PropertyName{kResolverSearch, "resolver_search", ValueType::TextList},
     PropertyName{kResolverOptions, "resolver_options", ValueType::TextList},
+    PropertyName{kReadAt, "read_at", ValueType::Number},
+    PropertyName{kReadInterval, "read_interval", ValueType::Number},
+    PropertyName{kReadProblem, "read_problem", ValueType::Text},
 };
 
 struct OriginName {

@@ -55,7 +55,7 @@ class ZORVA_AGENT_API TreeBuilder {
   /// A tree that has only the root.
   explicit TreeBuilder(std::string systemName);
 
-  /// A copy of a tree, to be changed by set.
+  /// A copy of a tree, to be changed by set and add.
   explicit TreeBuilder(const TreeSnapshot& base);
 
   TreeBuilder(const TreeBuilder&) = delete;

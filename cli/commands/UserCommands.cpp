@@ -15,7 +15,7 @@
 #include "agent/files/FileLock.h"
 #include "cli/commands/Commands.h"
 #include "cli/commands/ViewJson.h"
-#include "cli/operations/Secret.h"
+#include "util/Secret.h"
 #include "cli/output/Console.h"
 #include "cli/output/Failure.h"
 #include "cli/output/Table.h"
@@ -198,9 +198,9 @@ std::string askTwice(const std::string& name) {
   std::string first = ask("Password of " + name + ": ");
   std::string again = ask("The same again: ");
   const bool isSame = first == again;
-  Secret::wipe(again);
+  util::Secret::wipe(again);
   if (isSame) return first;
-  Secret::wipe(first);
+  util::Secret::wipe(first);
   throw Failure(ExitCode::Failed, "the two passwords differ", "nothing was changed; try again");
 }
 
@@ -225,7 +225,7 @@ void requireGood(const std::string& password, const std::string& name) {
 std::string newHash(const UserOptions& options) {
   const bool asks = !options.passwordFromInput && ::isatty(STDIN_FILENO) == 1;
   std::string text = asks ? askTwice(options.name) : lineOfInput();
-  const Secret password(text);
+  const util::Secret password(text);
   requireGood(password.text(), options.name);
   try {
     return access::hashPassword(password.text());

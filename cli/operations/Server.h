@@ -7,7 +7,7 @@
 #include <optional>
 #include <string>
 
-#include "cli/operations/Secret.h"
+#include "util/Secret.h"
 #include "cli/operations/ServerUrl.h"
 
 namespace zorva::cli {
@@ -21,7 +21,7 @@ struct Trust {
 struct Server {
   ServerUrl url;
   Trust trust = {};
-  std::shared_ptr<const Secret> password = nullptr;  ///< set if the URL has a user
+  std::shared_ptr<const util::Secret> password = nullptr;  ///< set if the URL has a user
 
   /// How long all operations together may take; nothing: only silence is limited.
   std::optional<std::chrono::milliseconds> patience = std::nullopt;

@@ -93,14 +93,14 @@ std::string readPasswordFile(const std::string& path) {
   const std::string place = "the password file " + printable(path);
   if (file.error != 0) throw Failure(ExitCode::WrongUsage, place + ": " + util::fileErrorText(file.error));
   if ((file.mode & 077U) != 0) {
-    Secret::wipe(file.text);
+    util::Secret::wipe(file.text);
     char mode[8];
     std::snprintf(mode, sizeof mode, "%04o", file.mode & 07777U);
     throw Failure(ExitCode::WrongUsage, place + " has mode " + mode + ": others than its owner may read or write it",
                   "chmod 600 " + printable(path));
   }
   std::string line = file.text.substr(0, file.text.find('\n'));
-  Secret::wipe(file.text);
+  util::Secret::wipe(file.text);
   return line;
 }
 
@@ -113,17 +113,17 @@ std::optional<std::string> passwordOfFile(const ServerOptions& options) {
   return std::nullopt;
 }
 
-std::shared_ptr<const Secret> secretOf(std::string text) {
+std::shared_ptr<const util::Secret> secretOf(std::string text) {
   if (text.ends_with('\r')) text.pop_back();
   const bool isWell = !text.empty() && text.size() <= kLongestPassword && text.find('\0') == std::string::npos;
-  if (isWell) return std::make_shared<const Secret>(text);
+  if (isWell) return std::make_shared<const util::Secret>(text);
   const bool isEmpty = text.empty();
-  Secret::wipe(text);
+  util::Secret::wipe(text);
   throw Failure(ExitCode::WrongUsage,
                 isEmpty ? "the password is empty" : "the password is longer than 1024 bytes, or has a NUL in it");
 }
 
-std::shared_ptr<const Secret> askFor(const std::string& user, const std::string& where) {
+std::shared_ptr<const util::Secret> askFor(const std::string& user, const std::string& where) {
   std::optional<std::string> typed = askTerminal("password of " + printable(user) + where + ": ", Echo::Hidden);
   if (typed) return secretOf(std::move(*typed));
   throw Failure(ExitCode::WrongUsage, "there is no terminal to ask for the password of " + printable(user),

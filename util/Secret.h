@@ -9,9 +9,9 @@
 
 #include "util/NotCopied.h"
 
-namespace zorva::cli {
+namespace zorva::util {
 
-class Secret : util::NotCopied {
+class Secret : NotCopied {
  public:
   /// Takes the text over and wipes the given one.
   explicit Secret(std::string& text) : text_(text) { wipe(text); }
@@ -29,4 +29,4 @@ class Secret : util::NotCopied {
   std::string text_;
 };
 
-}  // namespace zorva::cli
+}  // namespace zorva::util

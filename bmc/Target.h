@@ -1,0 +1,15 @@
+#pragma once
+
+// Which service is asked: the configured one, or the one that the firmware names.
+
+#include <optional>
+
+#include "agent/config/Config.h"
+#include "bmc/Service.h"
+
+namespace zorva::bmc {
+
+/// Nothing if there is none. Throws Failed if the firmware names one that cannot be used.
+std::optional<Target> findTarget(const agent::BmcConfig& config);
+
+}  // namespace zorva::bmc

@@ -1,0 +1,423 @@
+#!/usr/bin/env python3
+"""A Redfish service (DSP0266) for the tests, on a port of 127.0.0.1, with TLS, sessions and ETags.
+
+  service.py CERTIFICATE KEY [SCHEMA-FOLDER]
+
+Prints its port. Each line of standard input is a JSON object of switches (see SWITCHES), or of a command, and is answered
+with one line:
+  {"patch": 204}                         sets switches
+  {"set": {"PATH": {"FQDN": null}}}      changes a resource; null removes a property
+  {"log": true}                          the requests since the last time
+  {"get": "PATH"}                        a resource as it is
+  {"invalid": true}                      the answers that DMTF's schemas refuse, where their folder is given
+It ends with its standard input.
+"""
+import copy
+import http.server
+import json
+import pathlib
+import ssl
+import sys
+import threading
+import time
+import warnings
+
+USER, PASSWORD = "operator", "correct horse"
+ROOT = "/redfish/v1"
+SWITCHES = {
+    "etag": "strong",    # "strong", "weak" or "absent"
+    "expand": True,      # $expand is offered
+    "patch": 204,        # 200, 202, 204; 400 with ExtendedInfo; 503 or 412 once; 429
+    "task": "Completed", # the end of a task after a 202; "Exception" fails
+    "login": 201,        # 401 refuses everybody
+    "requests_of_session": 0,  # after that many the session has expired; 0: never
+    "uses_both": False,  # servers set by hand are used beside those of DHCP
+    "wrong": "",         # "html", "deep", "huge", "values", "trickle", "silent", "redirect", "far", "loop", "cycle", "many",
+                         # "head", "outside", "list", "busy"
+}
+
+
+def collection(kind, path, members):
+    return {"@odata.type": f"#{kind}Collection.{kind}Collection", "@odata.id": path, "Name": f"{kind} Collection",
+            "Members@odata.count": len(members), "Members": [{"@odata.id": each} for each in members]}
+
+
+def interface(manager, name, address, **more):
+    path = f"{ROOT}/Managers/{manager}/EthernetInterfaces/{name}"
+    body = {"@odata.type": "#EthernetInterface.v1_6_0.EthernetInterface", "@odata.id": path, "Id": name,
+            "Name": f"Network interface {name}", "Status": {"State": "Enabled", "Health": "OK"},
+            "InterfaceEnabled": True, "LinkStatus": "LinkUp", "HostName": "host1-bmc",
+            "FQDN": "host1-bmc.mgmt.example.org", "NameServers": ["192.0.2.53", "2001:db8::53"],
+            "StaticNameServers": ["192.0.2.53", "2001:db8::53", "", ""],
+            "DHCPv4": {"DHCPEnabled": False, "UseDNSServers": False, "UseDomainName": False},
+            "DHCPv6": {"OperatingMode": "Disabled", "UseDNSServers": False, "UseDomainName": False},
+            "IPv4Addresses": [{"Address": address, "SubnetMask": "255.255.255.0", "AddressOrigin": "Static"}],
+            "IPv6Addresses": [{"Address": "fe80::1", "PrefixLength": 64, "AddressOrigin": "LinkLocal",
+                               "AddressState": "Preferred"}]}
+    body.update(more)
+    return body
+
+
+def first_world():
+    world = {
+        f"{ROOT}/": {
+            "@odata.type": "#ServiceRoot.v1_20_0.ServiceRoot", "@odata.id": f"{ROOT}/", "Id": "RootService",
+            "Name": "Root Service", "RedfishVersion": "1.15.0", "Managers": {"@odata.id": f"{ROOT}/Managers"},
+            "SessionService": {"@odata.id": f"{ROOT}/SessionService"},
+            "Links": {"Sessions": {"@odata.id": f"{ROOT}/SessionService/Sessions"}}},
+        f"{ROOT}/Managers": collection("Manager", f"{ROOT}/Managers", [f"{ROOT}/Managers/1"]),
+    }
+    for manager, names in {"1": ["eth0", "usb0"]}.items():
+        path = f"{ROOT}/Managers/{manager}"
+        world[path] = {
+            "@odata.type": "#Manager.v1_24_0.Manager", "@odata.id": path, "Id": manager, "Name": "Manager",
+            "ManagerType": "BMC", "EthernetInterfaces": {"@odata.id": f"{path}/EthernetInterfaces"}}
+        ports = [f"{path}/EthernetInterfaces/{name}" for name in names]
+        world[f"{path}/EthernetInterfaces"] = collection("EthernetInterface", f"{path}/EthernetInterfaces", ports)
+    for body in (interface("1", "eth0", "192.0.2.20"),
+                 interface("1", "usb0", "169.254.0.17", LinkStatus="LinkDown", NameServers=[], StaticNameServers=[])):
+        world[body["@odata.id"]] = body
+    return world
+
+
+class Schemas:
+    """Says which answers DMTF's schemas refuse. Without the folder or the package jsonschema it says nothing."""
+
+    def __init__(self, folder):
+        self.folder = pathlib.Path(folder) if folder else None
+        self.invalid = []
+        self.checked = 0
+        warnings.filterwarnings("ignore", category=DeprecationWarning)
+        try:
+            import jsonschema
+            self.jsonschema = jsonschema if self.folder and self.folder.is_dir() else None
+        except ImportError:
+            self.jsonschema = None
+
+    def load(self, uri):
+        """A schema by its name; where the folder has another version only, that one."""
+        name = uri.split("#")[0].rsplit("/", 1)[-1]
+        files = [self.folder / name, *sorted(self.folder.glob(name.split(".")[0] + ".v*.json"), reverse=True)]
+        file = next((each for each in files if each.is_file()), None)
+        return json.loads(file.read_text(encoding="utf-8")) if file else {}
+
+    def check(self, path, body):
+        if self.jsonschema is None:
+            return
+        if "error" in body:
+            schema = self.load("redfish-error.v1_0_2.json")
+        else:
+            name = ".".join(body["@odata.type"].lstrip("#").split(".")[:-1])
+            schema = self.load(f"{name}.json")
+            if not (self.folder / f"{name}.json").is_file():
+                self.invalid.append(f"{path}: there is no schema {name}")
+        resolver = self.jsonschema.RefResolver(schema.get("$id", ""), schema, handlers={"http": self.load, "https": self.load})
+        validator = self.jsonschema.Draft7Validator(schema, resolver=resolver)
+        self.invalid += [f"{path}: {error.json_path}: {error.message}" for error in validator.iter_errors(body)]
+        self.checked += 1
+
+
+class Service:
+    def __init__(self, schemas):
+        self.lock = threading.Lock()
+        self.switches = dict(SWITCHES)
+        self.world = first_world()
+        self.versions = {}
+        self.log = []
+        self.sessions = {}  # token: (path, requests)
+        self.made = 0
+        self.task_polls = 0
+        self.once = None
+        self.schemas = schemas
+        self.dhcp_servers = ["198.51.100.1"]
+
+    def command(self, line):
+        with self.lock:
+            if "log" in line:
+                log, self.log = self.log, []
+                return log
+            if "get" in line:
+                return self.world.get(line["get"])
+            if "invalid" in line:
+                return {"checked": self.schemas.checked, "invalid": self.schemas.invalid}
+            for path, changes in line.pop("set", {}).items():
+                self.versions[path] = self.versions.get(path, 1) + 1
+                if changes is None:
+                    self.world.pop(path)
+                    continue
+                body = self.world.setdefault(path, {"@odata.id": path})
+                for name, value in changes.items():
+                    if value is None:
+                        body.pop(name, None)
+                    else:
+                        body[name] = value
+            self.switches.update(line)
+            self.once = self.switches["patch"]
+            return "ok"
+
+    def etag(self, path):
+        if self.switches["etag"] == "absent":
+            return None
+        text = f'"v{self.versions.get(path, 1)}"'
+        return "W/" + text if self.switches["etag"] == "weak" else text
+
+    def get(self, path, query):
+        body = copy.deepcopy(self.world.get(path) or self.world.get(path.rstrip("/")))
+        if body is None:
+            return None
+        if path == f"{ROOT}/":
+            offered = self.switches["expand"]
+            body["ProtocolFeaturesSupported"] = {
+                "ExpandQuery": {"ExpandAll": False, "Levels": False, "Links": False, "NoLinks": offered}}
+        elif query.startswith("$expand") and "Members" in body:
+            body["Members"] = [self.get(each["@odata.id"], "") or each for each in body["Members"]]
+        return body
+
+    def change(self, path, body):
+        """What a service does with a PATCH: lists keep their length, what is in use follows."""
+        now = self.world[path]
+        for name, value in body.items():
+            if isinstance(value, dict):
+                now.setdefault(name, {}).update(value)
+            else:
+                now[name] = value
+        slots = [each for each in now.get("StaticNameServers", []) if each]
+        dhcp = now.get("DHCPv4", {})
+        learned = self.dhcp_servers if dhcp.get("DHCPEnabled") and dhcp.get("UseDNSServers") else []
+        if "StaticNameServers" in now:
+            now["NameServers"] = learned + slots if self.switches["uses_both"] or not slots else slots
+        self.versions[path] = self.versions.get(path, 1) + 1
+
+
+def error(message, resolution="None."):
+    return {"error": {"code": "Base.1.8.GeneralError", "message": "A general error has occurred.",
+                      "@Message.ExtendedInfo": [{
+                          "@odata.type": "#Message.v1_1_1.Message", "MessageId": "Base.1.8.PropertyValueFormatError",
+                          "Message": message, "Severity": "Warning", "Resolution": resolution}]}}
+
+
+class Handler(http.server.BaseHTTPRequestHandler):
+    protocol_version = "HTTP/1.1"
+    service = None
+
+    def log_message(self, *_):
+        pass
+
+    def answer(self, status, body=None, **fields):
+        text = b""
+        if body is not None:
+            if isinstance(body, dict):
+                self.service.schemas.check(self.path, body)
+                text = json.dumps(body).encode()
+            else:
+                text = body
+            fields.setdefault("Content_Type", "application/json")
+        self.send_response(status)
+        for name, value in fields.items():
+            if value is not None:
+                self.send_header(name.replace("_", "-"), value)
+        if status != 304:
+            self.send_header("Content-Length", str(len(text)))
+        self.end_headers()
+        self.wfile.write(text)
+
+    def record(self, body=None):
+        entry = {"method": self.command, "path": self.path}
+        for name in ("If-Match", "If-None-Match"):
+            if self.headers.get(name):
+                entry[name] = self.headers[name]
+        if body is not None and "Sessions" not in self.path:
+            entry["body"] = body
+        self.service.log.append(entry)
+
+    def is_known(self):
+        """Whether the request is of a session that has not expired."""
+        token = self.headers.get("X-Auth-Token")
+        session = self.service.sessions.get(token)
+        if session is None:
+            self.answer(401, error("The session has expired."))
+            return False
+        session[1] += 1
+        most = self.service.switches["requests_of_session"]
+        if most and session[1] > most:
+            del self.service.sessions[token]
+            self.answer(401, error("The session has expired."))
+            return False
+        return True
+
+    def goes_wrong(self):
+        """Answers as no service should, and says whether it did."""
+        wrong = self.service.switches["wrong"]
+        is_interface = "/EthernetInterfaces" in self.path
+        if not wrong or not is_interface:
+            return False
+        if wrong == "html":
+            self.answer(200, b"<html>Sign in</html>", Content_Type="text/html")
+        elif wrong == "deep":
+            self.answer(200, b'{"a":' + b"[" * 100000 + b"]" * 100000 + b"}")
+        elif wrong == "values":
+            self.answer(200, b'{"a":[' + b"0," * 300000 + b"0]}")
+        elif wrong == "huge":
+            self.answer(200, b'{"a":"' + b"x" * (5 << 20) + b'"}')
+        elif wrong == "list":
+            self.answer(200, b"[]")
+        elif wrong == "trickle":
+            self.send_response(200)
+            self.send_header("Content-Length", "100000")
+            self.end_headers()
+            for _ in range(100):
+                self.wfile.write(b" ")
+                time.sleep(0.1)
+        elif wrong == "silent":
+            time.sleep(10)
+        elif wrong == "head":
+            self.answer(200, {}, **{f"X_Field{i}": "x" * 1000 for i in range(90)})
+        elif wrong == "busy":
+            self.answer(503, error("The service is busy."), Retry_After="1")
+        elif wrong == "redirect":
+            self.answer(307, None, Location=self.path.replace("/EthernetInterfaces", "/Elsewhere/EthernetInterfaces")
+                        if "Elsewhere" not in self.path else self.path)
+        elif wrong == "far":
+            self.answer(302, None, Location="https://192.0.2.99/redfish/v1/Managers")
+        elif wrong == "loop":
+            self.answer(302, None, Location=self.path)
+        elif wrong == "outside":
+            body = self.service.get(self.path.split("?")[0], "")
+            if "Members" in body:
+                body["Members"] = [{"@odata.id": "https://192.0.2.99/redfish/v1/Managers/2"}]
+            self.answer(200, json.dumps(body).encode())
+        elif wrong in ("cycle", "many"):
+            page = int(self.path.rsplit("skip=", 1)[-1]) if "skip=" in self.path else 0
+            body = self.service.get(f"{ROOT}/Managers/1/EthernetInterfaces", "")
+            if wrong == "cycle":
+                body["Members"] *= 3
+                body["Members@odata.nextLink"] = f"{ROOT}/Managers/1/EthernetInterfaces?skip=1"
+            else:
+                base = f"{ROOT}/Managers/1/EthernetInterfaces"
+                one = self.service.get(f"{base}/eth0", "")
+                body["Members"] = [dict(one, **{"@odata.id": f"{base}/x{page}-{i}", "Id": "same"}) for i in range(3000)]
+                body["Members@odata.nextLink"] = f"{base}?skip={page + 1}"
+            self.answer(200, json.dumps(body).encode())
+        else:
+            return False
+        return True
+
+    def do_GET(self):
+        with self.service.lock:
+            self.record()
+        path, _, query = self.path.partition("?")
+        service = self.service
+        if path.rstrip("/") != ROOT:
+            with service.lock:
+                known = self.is_known()
+            if not known or self.goes_wrong():
+                return
+        if path.startswith(f"{ROOT}/TaskService/"):
+            return self.answer_task()
+        with service.lock:
+            body = service.get(path, query)
+            etag = service.etag(path)
+        if body is None:
+            return self.answer(404, error("The resource was not found."))
+        if etag and not query and self.headers.get("If-None-Match") == etag:
+            return self.answer(304, None, ETag=etag)
+        return self.answer(200, body, ETag=None if query else etag)
+
+    def answer_task(self):
+        service = self.service
+        service.task_polls += 1
+        if service.task_polls < 3:
+            return self.answer(202, None)
+        state = service.switches["task"]
+        if state == "Completed":
+            return self.answer(204)
+        return self.answer(200, {
+            "@odata.type": "#Task.v1_7_4.Task", "@odata.id": f"{ROOT}/TaskService/Tasks/1", "Id": "1", "Name": "Task",
+            "TaskState": state, "TaskStatus": "Critical",
+            "Messages": [{"MessageId": "Base.1.8.InternalError", "Message": "The settings could not be stored."}]})
+
+    def body(self):
+        return json.loads(self.rfile.read(int(self.headers.get("Content-Length") or 0)) or b"null")
+
+    def do_POST(self):
+        body = self.body()
+        service = self.service
+        with service.lock:
+            self.record(body)
+            if service.switches["login"] != 201 or body != {"UserName": USER, "Password": PASSWORD}:
+                return self.answer(401, error("The login is wrong."))
+            service.made += 1
+            token = f"token-{service.made}"
+            path = f"{ROOT}/SessionService/Sessions/{service.made}"
+            service.sessions[token] = [path, 0]
+        self.answer(201, {"@odata.type": "#Session.v1_8_0.Session", "@odata.id": path, "Id": str(service.made),
+                          "Name": "User Session", "UserName": USER}, X_Auth_Token=token, Location=path)
+
+    def do_DELETE(self):
+        with self.service.lock:
+            self.record()
+            if not self.is_known():
+                return
+            self.service.sessions = {t: s for t, s in self.service.sessions.items() if s[0] != self.path}
+        self.answer(204)
+
+    def do_PATCH(self):
+        body = self.body()
+        service = self.service
+        with service.lock:
+            self.record(body)
+            if not self.is_known():
+                return
+            mode, status = service.once, service.switches["patch"]
+            if mode in (412, 503):
+                service.once = 204
+                status = mode
+            elif status in (412, 503):
+                status = 204
+            if self.path not in service.world:
+                return self.answer(404, error("The resource was not found."))
+            if status == 412 or (self.headers.get("If-Match") not in (None, service.etag(self.path))):
+                service.versions[self.path] = service.versions.get(self.path, 1) + 1
+                return self.answer(412, error("The resource has been changed."))
+            if status == 503:
+                return self.answer(503, error("The service is busy."), Retry_After="1")
+            if status >= 400:
+                return self.answer(status, error("The value 192.0.2.1 of StaticNameServers is refused.\n",
+                                                 "Send another value."))
+            service.task_polls = 0
+            if status != 202 or service.switches["task"] == "Completed":
+                service.change(self.path, body)
+            now = service.get(self.path, "")
+        if status == 202:
+            return self.answer(202, None, Location=f"{ROOT}/TaskService/TaskMonitors/1")
+        return self.answer(status, now if status == 200 else None, ETag=service.etag(self.path))
+
+
+class Server(http.server.ThreadingHTTPServer):
+    daemon_threads = True
+
+    def handle_error(self, *_):
+        pass  # clients that do not trust the certificate, or give up
+
+
+def main():
+    context = ssl.SSLContext(ssl.PROTOCOL_TLS_SERVER)
+    context.load_cert_chain(sys.argv[1], sys.argv[2])
+    service = Service(Schemas(sys.argv[3] if len(sys.argv) > 3 else None))
+    Handler.service = service
+    server = Server(("127.0.0.1", 0), Handler)
+    server.socket = context.wrap_socket(server.socket, server_side=True, do_handshake_on_connect=False)
+    threading.Thread(target=server.serve_forever, daemon=True).start()
+    print(server.server_address[1], flush=True)
+    for text in sys.stdin:
+        line = json.loads(text)
+        if "certificate" in line:
+            context.load_cert_chain(line["certificate"], line["key"])
+            answer = "ok"
+        else:
+            answer = service.command(line)
+        print(json.dumps(answer), flush=True)
+
+
+if __name__ == "__main__":
+    main()
