@@ -16,7 +16,8 @@ const Config& configOfHost() {
 }
 
 Applier makeApplier(OverlayValues overlay) {
-  return {configOfHost().dataDir, [] { return Runtime::instance().lookAtSource(); }, std::move(overlay)};
+  const Config& config = configOfHost();
+  return {config.dataDir, [] { return Runtime::instance().lookAtSource(); }, std::move(overlay), config.bmc.file};
 }
 
 // A wrong overlay must not keep anybody from taking changes back.

@@ -61,7 +61,8 @@ std::string joined(const StringList& words) {
 
 JsonValue propertiesFor(const Ethernet& now, const WantedDns& wanted) {
   JsonValue properties = JsonValue::object();
-  if (wanted.servers) {
+  const bool setsServers = wanted.servers && withoutPadding(*wanted.servers) != now.servers();
+  if (setsServers) {
     if (!now.staticServers) {
       throw Failed("interface " + now.id + " has no StaticNameServers, so nobody can set its DNS servers by Redfish");
     }
@@ -77,7 +78,7 @@ JsonValue propertiesFor(const Ethernet& now, const WantedDns& wanted) {
   for (const DhcpOf& family : kFamilies) {
     const Dhcp& dhcp = now.*family.dhcp;
     JsonValue object = JsonValue::object();
-    if (wanted.servers && dhcp.givesServers()) addBoolean(object, kUseServers, false);
+    if (setsServers && dhcp.givesServers()) addBoolean(object, kUseServers, false);
     if (setsDomain && dhcp.givesDomain()) addBoolean(object, kUseDomain, false);
     addUnlessEmpty(properties, family.name, std::move(object));
   }
@@ -123,8 +124,9 @@ JsonValue differenceFrom(const Ethernet& now, const JsonValue& properties) {
 
 std::string warningBefore(const Ethernet& now, const WantedDns& wanted) {
   std::string warning;
-  StringList dropped = wanted.servers ? now.learnedServers() : StringList();
-  if (wanted.servers) {
+  StringList dropped;
+  if (wanted.servers && withoutPadding(*wanted.servers) != now.servers()) {
+    dropped = now.learnedServers();
     const StringList kept = withoutPadding(*wanted.servers);
     std::erase_if(dropped, [&](const std::string& each) { return std::find(kept.begin(), kept.end(), each) != kept.end(); });
   }

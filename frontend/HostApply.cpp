@@ -21,6 +21,10 @@ namespace {
 using agent::ApplyResult;
 using Clock = std::chrono::steady_clock;
 
+/// Of the service processor's keys.
+constexpr const char* kBmcPrefix = "BMC%";
+constexpr const char* kBmcSystem = "BMC:-1";
+
 /// Empty for a class whose instances are not applied.
 std::string interfaceOf(const broker::ObjectPath& path) {
   if (util::sameName(path.className, kGeneralSettingClass)) {
@@ -30,7 +34,11 @@ std::string interfaceOf(const broker::ObjectPath& path) {
   if (!isSetting && !util::sameName(path.className, kEndpointClass)) return {};
   const broker::Value* key = path.key(isSetting ? "InstanceID" : "Name");
   if (key == nullptr) return {};
-  return isSetting ? interfaceOfId(key->asText()) : std::string(key->asText());
+  const std::string text(key->asText());
+  if (isSetting) return text.starts_with(kBmcPrefix) ? text : interfaceOfId(text);
+  const broker::Value* system = path.key("SystemName");
+  const bool isOfBmc = system != nullptr && system->asText() == kBmcSystem;
+  return (isOfBmc ? kBmcPrefix : "") + text;
 }
 
 ApplyResult resultFor(const std::string& interface, bool isDryRun, SettingsLockIs lock) {

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <optional>
+#include <set>
 #include <stdexcept>
 #include <utility>
 
@@ -86,8 +87,8 @@ std::uint64_t secondsOf(system_clock::time_point time) {
 
 }  // namespace
 
-Applier::Applier(const std::string& dataDir, HostDns::Look look, OverlayValues overlay)
-    : dataDir_(dataDir), file_(dataDir), overlay_(std::move(overlay)), host_(std::move(look)) {}
+Applier::Applier(const std::string& dataDir, HostDns::Look look, OverlayValues overlay, const std::string& bmcFile)
+    : dataDir_(dataDir), file_(dataDir), overlay_(std::move(overlay)), host_(std::move(look), bmcFile) {}
 
 std::vector<ApplyResult> Applier::apply(const std::vector<std::string>& names, const ApplyOptions& options) {
   std::optional<ApplyLock> lock;
@@ -96,8 +97,9 @@ std::vector<ApplyResult> Applier::apply(const std::vector<std::string>& names, c
   readState(!options.dryRun);
   std::vector<Plan> plans;
   const auto hasSettings = [&](const HostInterface& interface) {
-    return ::access(settingsFileOf(dataDir_, interface.name).c_str(), F_OK) == 0 ||
-           hasDnsSettings(overlay_, interface.path);
+    const bool hasFile = !interface.settingsName.empty() &&
+                         ::access(settingsFileOf(dataDir_, interface.settingsName).c_str(), F_OK) == 0;
+    return hasFile || hasDnsSettings(overlay_, interface.path);
   };
   for (const HostInterface& interface : choose(names, hasSettings))
     plans.push_back(planFor(interface, options.automatic));
@@ -121,21 +123,22 @@ std::vector<ApplyResult> Applier::apply(const std::vector<std::string>& names, c
 // Names that are in no tree come first. Without names those that are meant.
 std::vector<HostInterface> Applier::choose(const std::vector<std::string>& names,
                                            const std::function<bool(const HostInterface&)>& isMeant) const {
-  const auto isNamed = [&](const std::string& name) {
-    return std::find(names.begin(), names.end(), name) != names.end();
-  };
   std::vector<HostInterface> chosen;
+  std::set<std::string> named;
   for (const std::string& name : names) {
-    HostInterface interface = host_.interface(name);
+    const std::vector<HostInterface> found = host_.named(name);
+    for (const HostInterface& interface : found) named.insert(interface.path);
     const auto isSame = [&](const HostInterface& other) { return other.name == name; };
-    if (interface.path.empty() && std::none_of(chosen.begin(), chosen.end(), isSame)) {
-      chosen.push_back(std::move(interface));
-    }
+    if (found.empty() && std::none_of(chosen.begin(), chosen.end(), isSame)) chosen.push_back(host_.interface(name));
   }
   for (HostInterface& interface : host_.interfaces()) {
-    if (names.empty() ? isMeant(interface) : isNamed(interface.name)) chosen.push_back(std::move(interface));
+    if (names.empty() ? isMeant(interface) : named.contains(interface.path)) chosen.push_back(std::move(interface));
   }
   return chosen;
+}
+
+Expected<WantedSettings, std::string> Applier::wantedOf(const HostInterface& interface) const {
+  return readWanted(dataDir_, interface.settingsName, overlay_, interface.path);
 }
 
 Applier::Plan Applier::planFor(const HostInterface& interface, bool automatic) {
@@ -146,7 +149,7 @@ Applier::Plan Applier::planFor(const HostInterface& interface, bool automatic) {
     plan.result.problem = noInterface(interface.name);
     return plan;
   }
-  const auto read = readWanted(dataDir_, interface.name, overlay_, interface.path);
+  const auto read = wantedOf(interface);
   if (!read) {
     plan.result.problem = read.error();
     return plan;
@@ -156,7 +159,7 @@ Applier::Plan Applier::planFor(const HostInterface& interface, bool automatic) {
     plan.result.note = "these settings were taken back; 'zorvactl apply " + interface.name + "' applies them again";
     return plan;
   }
-  const auto wanted = checked(*read, interface.name);
+  const auto wanted = checked(*read, host_.targetFor(interface, {}).zone);
   if (!wanted) {
     plan.result.problem = wanted.error();
     return plan;
@@ -192,7 +195,8 @@ void Applier::planSettings(Plan& plan, const WantedSettings& wanted) {
   plan.before = host_.shown(plan.interface, owner);
   plan.settings = plan.before.lists;
   if (wanted.servers.has_value()) plan.settings.servers = *wanted.servers;
-  const std::string ownDomain = owner == kResolvConfOwner ? std::string() : host_.ownDomain();
+  const bool hasOwnDomain = owner != kResolvConfOwner && owner != kBmcOwner;
+  const std::string ownDomain = hasOwnDomain ? host_.ownDomain() : std::string();
   planSuffixes(plan, wanted, ownDomain);
 
   plan.after.lists = writer.asHeld(plan.settings);
@@ -200,9 +204,11 @@ void Applier::planSettings(Plan& plan, const WantedSettings& wanted) {
   const StringList& names = plan.after.lists.suffixes;
   if (owner != kResolvConfOwner) plan.after.domain = names.empty() ? ownDomain : names.front();
   plan.result.changes = differences(plan.before, plan.after);
-  const auto saved = writer.save(plan.target);
+  const auto warning = writer.warningBefore(plan.target, plan.settings);
+  const auto saved = warning ? writer.save(plan.target) : Expected<std::string, Refusal>(unexpected(warning.error()));
   if (saved) {
     plan.saved = *saved;
+    plan.result.note = *warning;
   } else {
     plan.result.problem = saved.error();
   }
@@ -211,6 +217,11 @@ void Applier::planSettings(Plan& plan, const WantedSettings& wanted) {
 // A domain that was put before the suffixes by an earlier call is none of them.
 void Applier::planSuffixes(Plan& plan, const WantedSettings& wanted, const std::string& ownDomain) const {
   StringList& suffixes = plan.settings.suffixes;
+  if (plan.interface.isOfBmc) {
+    // It has no search list but its domain.
+    if (wanted.domain.has_value()) suffixes = listOfText(*wanted.domain);
+    return;
+  }
   const auto added = state_.memory.addedDomains.find(plan.interface.name);
   const bool hasAdded =
       added != state_.memory.addedDomains.end() && !suffixes.empty() && util::sameName(suffixes.front(), added->second);
@@ -298,7 +309,7 @@ void Applier::remember(const Plan& plan) {
 
 // What a person took back must not come again by itself.
 void Applier::holdBack(const std::string& interface) {
-  const auto wanted = readWanted(dataDir_, interface, overlay_, host_.interface(interface).path);
+  const auto wanted = wantedOf(host_.interface(interface));
   if (wanted && wanted->any()) state_.heldBack[interface] = textOf(*wanted);
 }
 

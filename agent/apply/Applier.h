@@ -17,7 +17,8 @@ namespace zorva::agent {
 /// One call of the functions in Apply.h. Belongs to one thread.
 class Applier {
  public:
-  Applier(const std::string& dataDir, HostDns::Look look, OverlayValues overlay);
+  /// bmcFile is what zorva-bmc keeps.
+  Applier(const std::string& dataDir, HostDns::Look look, OverlayValues overlay, const std::string& bmcFile);
 
   std::vector<ApplyResult> apply(const std::vector<std::string>& names, const ApplyOptions& options);
   std::vector<ApplyResult> revert(const std::vector<std::string>& names, const ApplyOptions& options);
@@ -42,6 +43,7 @@ class Applier {
 
   std::vector<HostInterface> choose(const std::vector<std::string>& names,
                                     const std::function<bool(const HostInterface&)>& isMeant) const;
+  Expected<WantedSettings, std::string> wantedOf(const HostInterface& interface) const;
   Plan planFor(const HostInterface& interface, bool automatic);
   void holdBack(const std::string& interface);
   void planOwner(Plan& plan);

@@ -23,12 +23,13 @@ struct DnsTarget {
   std::string profile;        ///< the owner's profile or file, as the tree shows it
   StringList serversInFull;   ///< as in DnsFacts: an address that stays keeps its port and name
   StringList routingDomains;  ///< stay as they are
+  std::string zone = {};      ///< the name of the link, which link-local servers have
 };
 
 /// Why an owner was not changed: one line that names the owner and the next step of a person.
 using Refusal = std::string;
 
-/// One for each owner. Calls wait for the owner, 10 s at most each. Belongs to one thread.
+/// One for each owner. Calls wait for the owner, 10 s at most each; for a service processor 75 s. Belongs to one thread.
 class DnsWriter {
  public:
   virtual ~DnsWriter() = default;
@@ -36,6 +37,10 @@ class DnsWriter {
   /// The same settings in the order, and with the duplicates left out, in which this owner would show them after
   /// write().
   virtual DnsSettings asHeld(const DnsSettings& settings) const = 0;
+
+  /// What a person should know before these settings are written; empty for nothing. Refused where it is known before
+  /// that they cannot be written.
+  virtual Expected<std::string, Refusal> warningBefore(const DnsTarget&, const DnsSettings&) { return std::string(); }
 
   /// All that restore() needs to bring back what the owner has now: a JSON text that only this class reads.
   virtual Expected<std::string, Refusal> save(const DnsTarget& target) = 0;

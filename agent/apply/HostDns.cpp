@@ -40,7 +40,8 @@ bool sameLists(const DnsSettings& left, const DnsSettings& right) {
   return sameNames(left.servers, right.servers) && sameNames(left.suffixes, right.suffixes);
 }
 
-HostDns::HostDns(Look look) : look_(std::move(look)), bus_(kBusSocket), choice_(bus_, kRoot) {}
+HostDns::HostDns(Look look, std::string bmcFile)
+    : look_(std::move(look)), bmcFile_(std::move(bmcFile)), bus_(kBusSocket), choice_(bus_, kRoot) {}
 
 void HostDns::look() {
   const std::vector<Link> links = reader_.read().links;
@@ -66,7 +67,16 @@ bool HostDns::isInTree(const ChosenOwner& owner, const HostInterface& interface)
   return !owner.speaks || node == nullptr || textOf(*node, kDnsOwner) == owner.name;
 }
 
+Expected<ChosenOwner, Refusal> HostDns::ownerOfBmc(const HostInterface& interface) const {
+  const Node* node = nodeOf(interface);
+  if (node == nullptr || textOf(*node, kDnsOwner) != kBmcOwner) {
+    return unexpected(interface.name + " is not kept by zorva-bmc, so it cannot be changed");
+  }
+  return ChosenOwner{kBmcOwner, textOf(*node, kDnsProfile), true};
+}
+
 Expected<ChosenOwner, Refusal> HostDns::ownerOf(const HostInterface& interface) {
+  if (interface.isOfBmc) return ownerOfBmc(interface);
   for (;;) {
     auto owner = choice_.choose(interface.link);
     const auto doubt = choice_.doubtAbout(interface.link);
@@ -81,25 +91,38 @@ Expected<ChosenOwner, Refusal> HostDns::ownerOf(const HostInterface& interface) 
 
 HostInterface HostDns::interfaceOf(const std::string& name, const std::string& path) const {
   const auto link = links_.find(name);
-  return {name, path, link == links_.end() ? Link() : link->second};
+  return {name, path, link == links_.end() ? Link() : link->second, false, name};
+}
+
+HostInterface HostDns::interfaceOfBmc(const Node& node, const std::string& name) const {
+  return {node.path(), node.path(), {}, true, links_.contains(name) ? std::string() : name};
 }
 
 std::vector<HostInterface> HostDns::interfaces() const {
   std::vector<HostInterface> interfaces;
   for (const Node& node : tree_->nodes()) {
-    if (node.type() == NodeType::NetworkIPConfig)
-      interfaces.push_back(interfaceOf(textOf(node, PROP_NAME), node.path()));
+    if (node.type() != NodeType::NetworkIPConfig) continue;
+    const std::string name = textOf(node, PROP_NAME);
+    const bool isOfBmc = tree_->parent(tree_->parent(node)).isServiceProcessor();
+    interfaces.push_back(isOfBmc ? interfaceOfBmc(node, name) : interfaceOf(name, node.path()));
   }
   return interfaces;
 }
 
+std::vector<HostInterface> HostDns::named(const std::string& name) const {
+  std::vector<HostInterface> found;
+  for (HostInterface& interface : interfaces()) {
+    const Node& node = *nodeOf(interface);
+    const bool isOfBmc = interface.isOfBmc && textOf(node, PROP_NAME) == (name.starts_with("BMC%") ? name.substr(4) : "");
+    if (interface.name == name || interface.settingsName == name || isOfBmc) found.push_back(std::move(interface));
+  }
+  return found;
+}
+
 // The tree may lack the loopback interface.
 HostInterface HostDns::interface(const std::string& name) const {
-  for (const Node& node : tree_->nodes()) {
-    if (node.type() == NodeType::NetworkIPConfig && textOf(node, PROP_NAME) == name)
-      return interfaceOf(name, node.path());
-  }
-  return interfaceOf(name, {});
+  const std::vector<HostInterface> found = named(name);
+  return found.empty() ? interfaceOf(name, {}) : found.front();
 }
 
 std::vector<std::string> HostDns::othersWith(const ChosenOwner& owner, const HostInterface& interface) const {
@@ -108,7 +131,9 @@ std::vector<std::string> HostDns::othersWith(const ChosenOwner& owner, const Hos
 
 DnsWriter* HostDns::writerOf(const std::string& owner) {
   std::unique_ptr<DnsWriter>& writer = writers_[owner];
-  if (writer == nullptr) writer = makeWriter(owner, bus_, kRoot);
+  if (writer == nullptr) {
+    writer = owner == kBmcOwner ? makeBmcWriter(bmcFile_) : makeWriter(owner, bus_, kRoot);
+  }
   return writer.get();
 }
 
@@ -117,9 +142,10 @@ const Node* HostDns::nodeOf(const HostInterface& interface) const {
 }
 
 DnsTarget HostDns::targetFor(const HostInterface& interface, const std::string& profile) const {
-  DnsTarget target{interface.name, interface.link.index, profile, {}, {}};
+  DnsTarget target{interface.name, interface.link.index, profile, {}, {}, interface.name};
   const Node* node = nodeOf(interface);
   if (node == nullptr) return target;
+  target.zone = textOf(*node, PROP_NAME);
   target.serversInFull = listOf(*node, kDnsServersInFull);
   target.routingDomains = listOf(*node, kDnsRoutingDomains);
   return target;

@@ -22,13 +22,15 @@ namespace zorva::agent {
 
 inline constexpr const char* kResolvConfOwner = "/etc/resolv.conf";
 
-/// An interface of the host, or a name that is none.
+/// An interface of the host or of its service processor, or a name that is none.
 struct HostInterface {
-  std::string name;
+  std::string name;  ///< of a service processor's the path, since its name need not be the only one
   std::string path;  ///< of its node in the tree; empty where it has none
   Link link;         ///< index 0 where the kernel has none
+  bool isOfBmc = false;
+  std::string settingsName;  ///< names its file of settings; empty: a file of that name is of the host's interface
 
-  bool exists() const { return link.index != 0; }
+  bool exists() const { return isOfBmc || link.index != 0; }
 };
 
 /// Belongs to one thread.
@@ -37,13 +39,18 @@ class HostDns {
   /// The tree of the host, without the values of the overlay, as it is now.
   using Look = std::function<std::shared_ptr<const TreeSnapshot>()>;
 
-  explicit HostDns(Look look);
+  /// bmcFile is what zorva-bmc keeps; its socket is beside it.
+  HostDns(Look look, std::string bmcFile);
 
   /// Reads the tree and asks the owners. To be called before all else; what the owners say is as of this call.
   void look();
 
   /// Those of the tree, in its order.
   std::vector<HostInterface> interfaces() const;
+  /// Those of that name. A service processor's also have their path and "BMC%NAME" for names, and their own name unless
+  /// the host has an interface of that name.
+  std::vector<HostInterface> named(const std::string& name) const;
+  /// The first of them.
   HostInterface interface(const std::string& name) const;
 
   /// Looks again while an owner starts or stops that may have the interface, for 10 s at most in the life of this.
@@ -71,9 +78,12 @@ class HostDns {
   bool mayLookAgain();
   bool isInTree(const ChosenOwner& owner, const HostInterface& interface) const;
   HostInterface interfaceOf(const std::string& name, const std::string& path) const;
+  HostInterface interfaceOfBmc(const Node& node, const std::string& name) const;
+  Expected<ChosenOwner, Refusal> ownerOfBmc(const HostInterface& interface) const;
   const Node* nodeOf(const HostInterface& interface) const;
 
   Look look_;
+  std::string bmcFile_;
   BusCalls bus_;
   OwnerChoice choice_;
   LinkReader reader_;

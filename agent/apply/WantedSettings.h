@@ -29,7 +29,7 @@ inline constexpr std::size_t kMostApplied = 64;  ///< servers, and suffixes
 std::string settingsFileOf(const std::string& dataDir, const std::string& interface);
 
 /// Each value is that of the interface's file if it has the key, else that of the overlay for the node at that path.
-/// The error is one line.
+/// Without a name of an interface no file counts. The error is one line.
 Expected<WantedSettings, std::string> readWanted(const std::string& dataDir, const std::string& interface,
                                                  const OverlayValues& overlay, const std::string& path);
 

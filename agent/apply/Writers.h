@@ -16,7 +16,10 @@ std::unique_ptr<DnsWriter> makeResolvedWriter(BusCalls& bus);
 std::unique_ptr<DnsWriter> makeNetworkdWriter(BusCalls& bus, const std::string& root);
 std::unique_ptr<DnsWriter> makeResolvConfWriter(const std::string& root);
 
-/// The writer of an owner, by its name in the tree; null where there is none.
+/// bmcFile is what zorva-bmc keeps; its socket is beside it.
+std::unique_ptr<DnsWriter> makeBmcWriter(const std::string& bmcFile);
+
+/// The writer of an owner of the host, by its name in the tree; null where there is none.
 std::unique_ptr<DnsWriter> makeWriter(const std::string& owner, BusCalls& bus, const std::string& root);
 
 }  // namespace zorva::agent

@@ -102,6 +102,20 @@ void writeHost(const HostView& view, const Layout& layout) {
   if (!host.place().empty()) writeWrapped("The suffixes are " + host.place() + ".", layout);
 }
 
+/// As of when the service processor's interfaces are.
+void addReading(Table& table, const std::optional<BmcReading>& bmc) {
+  if (!bmc) return;
+  table.add({"read", Cell(bmc->text(), bmc->isUnknown ? Style::Bad : Style::Plain)});
+  if (!bmc->problem.empty()) table.add({"problem", Cell(bmc->problem, Style::Warning)});
+}
+
+void writeBmc(const HostView& view, const Layout& layout) {
+  if (!view.bmc) return;
+  Table table({}, 2);
+  addReading(table, view.bmc);
+  write("\n" + styled("Service processor", Style::Heading, layout) + "\n" + table.text(layout));
+}
+
 Table settingTable(const std::vector<SettingRow>& rows, bool hasSources) {
   std::vector<std::string> headings{"SETTING", "VALUE"};
   if (hasSources) headings.insert(headings.begin() + 1, "FROM");
@@ -115,7 +129,8 @@ Table settingTable(const std::vector<SettingRow>& rows, bool hasSources) {
 }
 
 /// All of one interface, with everything in full.
-void writeInterface(const InterfaceRow& row, bool hasSources, const Layout& layout) {
+void writeInterface(const InterfaceRow& row, const HostView& view, const Layout& layout) {
+  const bool hasSources = view.hasSources;
   const OwnerFacts& facts = row.facts;
   Table table({}, 2);
   const auto addText = [&table](const char* label, const std::string& text) {
@@ -146,6 +161,7 @@ void writeInterface(const InterfaceRow& row, bool hasSources, const Layout& layo
   addText("multicast DNS", facts.multicastDns);
   addText("host name", row.hostName);
   addText("system", row.system);
+  if (row.isServiceProcessor) addReading(table, view.bmc);
   write(table.text(layout) + "\n" + settingTable(row.settings, hasSources).text(layout));
 }
 
@@ -170,13 +186,14 @@ void writeView(const HostView& view, const ShowOptions& options, const Layout& l
   if (!options.names.empty()) {
     for (const InterfaceRow& row : view.interfaces) {
       if (&row != &view.interfaces.front()) write("\n");
-      writeInterface(row, view.hasSources, layout);
+      writeInterface(row, view, layout);
     }
     return;
   }
   write("DNS client configuration of " + styled(printable(view.systemName), Style::Heading, layout) + "\n\n");
   writeInterfaces(view, options.all, layout);
   writeHost(view, layout);
+  writeBmc(view, layout);
 }
 
 void showHost(const Globals& globals, const ShowOptions& options) {

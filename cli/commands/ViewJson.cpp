@@ -95,12 +95,26 @@ Json ofHost(const HostRow& host, bool hasSources) {
 
 }  // namespace
 
+namespace {
+
+Json ofReading(const BmcReading& bmc) {
+  Json entry;
+  entry["read_at"] = bmc.at;
+  entry["age"] = bmc.age;
+  entry["is_unknown"] = bmc.isUnknown;
+  entry["problem"] = orNull(bmc.problem);
+  return entry;
+}
+
+}  // namespace
+
 std::string hostViewJson(const HostView& view) {
   Json json;
   json["system"] = asUtf8(view.systemName);
   json["interfaces"] =
       ofRows(view.interfaces, [&](const InterfaceRow& row) { return ofInterface(row, view.hasSources); });
   json["host"] = ofHost(view.host, view.hasSources);
+  json["service_processor"] = view.bmc ? ofReading(*view.bmc) : Json(nullptr);
   return documentText(json);
 }
 

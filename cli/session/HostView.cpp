@@ -1,6 +1,7 @@
 #include "cli/session/HostView.h"
 
 #include <algorithm>
+#include <chrono>
 #include <map>
 #include <memory>
 #include <string_view>
@@ -9,6 +10,7 @@
 #include <utility>
 
 #include "agent/Agent.h"
+#include "agent/tree/BmcJson.h"
 #include "cli/output/Failure.h"
 #include "cli/output/Text.h"
 #include "cli/output/ValueText.h"
@@ -147,6 +149,11 @@ std::vector<SettingRow> settingsOf(const SettingName (&names)[Size], const broke
   return rows;
 }
 
+std::uint64_t secondsNow() {
+  const auto now = std::chrono::system_clock::now().time_since_epoch();
+  return static_cast<std::uint64_t>(std::chrono::duration_cast<std::chrono::seconds>(now).count());
+}
+
 std::string textOf(const zorva::agent::Node& node, zorva::agent::PropertyNumber number) {
   const std::string* text = node.text(number);
   return text == nullptr ? std::string() : *text;
@@ -279,12 +286,28 @@ void readSystemNode(const zorva::agent::TreeSnapshot& tree, HostRow& host) {
   }
 }
 
+std::optional<BmcReading> readingOfBmc(const zorva::agent::TreeSnapshot& tree) {
+  using namespace zorva::agent;
+  for (const Node& node : tree.nodes()) {
+    const unsigned int* at = node.number(kReadAt);
+    const unsigned int* interval = node.number(kReadInterval);
+    if (!node.isServiceProcessor() || at == nullptr || interval == nullptr) continue;
+    BmcState state;
+    state.readAt = *at;
+    state.interval = *interval;
+    const std::uint64_t now = secondsNow();
+    return BmcReading{*at, now > *at ? now - *at : 0, state.isUnknownAt(now), textOf(node, kReadProblem)};
+  }
+  return std::nullopt;
+}
+
 void readHost(Session& session, HostView& view, const LocalFacts* local) {
   HostRow& host = view.host;
   host.interface = interfaceOfHostSettings(session).value_or("");
   if (local != nullptr) {
     host.hasFile = local->hasFile(host.interface);
     readSystemNode(local->tree(), host);
+    view.bmc = readingOfBmc(local->tree());
   }
   for (const broker::Instance& instance : askedFor(session, kGeneralSettingClass, view)) {
     host.settings = settingsOf(kHostSettings, instance, host.interface, local, false);
@@ -342,6 +365,21 @@ bool HostView::couldAsk(std::string_view className) const {
   return std::none_of(problems.begin(), problems.end(), [className](const Problem& each) {
     return std::find(each.names.begin(), each.names.end(), className) != each.names.end();
   });
+}
+
+std::string BmcReading::text() const {
+  constexpr std::uint64_t kMinute = 60;
+  constexpr std::uint64_t kHour = 60 * kMinute;
+  constexpr std::uint64_t kDay = 24 * kHour;
+  std::string text;
+  if (age < 2 * kMinute) {
+    text = std::to_string(age) + " s ago";
+  } else if (age < 2 * kHour) {
+    text = std::to_string(age / kMinute) + " min ago";
+  } else {
+    text = age < 2 * kDay ? std::to_string(age / kHour) + " h ago" : std::to_string(age / kDay) + " days ago";
+  }
+  return text + (isUnknown ? "; what it has now is not known" : "");
 }
 
 bool InterfaceRow::hasDns() const {

@@ -94,10 +94,22 @@ struct HostRow {
   std::string place() const;
 };
 
+/// When the service processor was read. Its interfaces are as of then.
+struct BmcReading {
+  std::uint64_t at = 0;   ///< seconds since 1970
+  std::uint64_t age = 0;  ///< seconds
+  bool isUnknown = false;  ///< so long ago that nobody knows what it has now
+  std::string problem;     ///< why the latest reading failed; empty if it did not
+
+  /// "12 s ago"; and that it counts as unknown.
+  std::string text() const;
+};
+
 struct HostView {
   std::string systemName;
   std::vector<InterfaceRow> interfaces;  ///< in the order of their names
   HostRow host;
+  std::optional<BmcReading> bmc;  ///< nothing where zorva-bmc read none
   bool hasSources = true;         ///< false: owners and the settings' sources are not known, for example with a server
   std::vector<Problem> problems;  ///< the failed queries; their parts of the view are empty
 
