@@ -141,6 +141,12 @@ Service::Service(const agent::BmcConfig& config, Target target, Patience patienc
   state_.interval = static_cast<std::uint64_t>(config.interval);
 }
 
+/// Also after stop().
+void Service::logOut() noexcept {
+  https_.setCancel(nullptr);
+  redfish_.logOut();
+}
+
 bool Service::readOnce() {
   try {
     redfish_.begin(Clock::now() + patience_.reading);

@@ -45,7 +45,7 @@ class Service : util::NotCopied {
   void run();
 
   /// Ends the session.
-  void logOut() noexcept { redfish_.logOut(); }
+  void logOut() noexcept;
 
   /// Async-signal-safe.
   void stop() noexcept { isStopped_ = true; }

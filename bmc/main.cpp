@@ -6,6 +6,7 @@
 #include <exception>
 #include <string_view>
 
+#include "bmc/HostInterface.h"
 #include "bmc/Service.h"
 #include "bmc/Target.h"
 
@@ -63,7 +64,7 @@ bool read(int argc, char** argv, Options& options, int& status) {
 
 int serve(const Options& options) {
   const agent::Config config = options.config.empty() ? agent::readDefaultConfig() : agent::readConfig(options.config);
-  std::optional<bmc::Target> target = bmc::findTarget(config.bmc);
+  std::optional<bmc::Target> target = bmc::findTarget(config.bmc, bmc::kSmbiosTable);
   if (!target || config.bmc.file.empty()) {
     std::fputs("zorva-bmc: no service processor is configured ([bmc] url), and the firmware names none\n", stderr);
     return options.once ? 1 : 0;

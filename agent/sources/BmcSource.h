@@ -35,6 +35,7 @@ class BmcSource : public TreeSource {
   bool isUnknown() const;
   void readState();
   std::shared_ptr<const TreeSnapshot> merged() const;
+  void addSystem(TreeBuilder& builder, const Node& system) const;
 
   std::shared_ptr<TreeSource> host_;
   std::string file_;

@@ -271,12 +271,13 @@ class Handler(http.server.BaseHTTPRequestHandler):
         elif wrong == "silent":
             time.sleep(10)
         elif wrong == "head":
-            self.answer(200, {}, **{f"X_Field{i}": "x" * 1000 for i in range(90)})
+            self.answer(200, b"{}", **{f"X_Field{i}": "x" * 1000 for i in range(90)})
         elif wrong == "busy":
             self.answer(503, error("The service is busy."), Retry_After="1")
         elif wrong == "redirect":
-            self.answer(307, None, Location=self.path.replace("/EthernetInterfaces", "/Elsewhere/EthernetInterfaces")
-                        if "Elsewhere" not in self.path else self.path)
+            if "/Elsewhere/" in self.path:
+                return False
+            self.answer(307, None, Location=self.path.replace("/EthernetInterfaces", "/Elsewhere/EthernetInterfaces"))
         elif wrong == "far":
             self.answer(302, None, Location="https://192.0.2.99/redfish/v1/Managers")
         elif wrong == "loop":

@@ -1,0 +1,153 @@
+// The programs together: zorva-bmc beside the tests' Redfish service, and zorvactl, which sees and changes it.
+
+#include <fcntl.h>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <signal.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <thread>
+
+#include "bmc/testing/TestRedfish.h"
+#include "http/testing/TestCertificates.h"
+
+namespace zorva::bmc {
+namespace {
+
+using agent::testing::contentsOf;
+using http::testing::outputOf;
+using ::testing::AllOf;
+using ::testing::HasSubstr;
+using ::testing::Not;
+using testing::json;
+using testing::kEth0;
+
+/// zorva-bmc as a process, its standard error in a file.
+class RunningBmc : util::NotCopied {
+ public:
+  explicit RunningBmc(const testing::TestRedfish& redfish, const std::string& config)
+      : log_(redfish.directory() / "log"), socket_(socketBeside(redfish.bmcJson())) {
+    process_ = ::fork();
+    if (process_ == 0) {
+      ::dup2(::open(log_.c_str(), O_CREAT | O_WRONLY | O_TRUNC, 0600), STDERR_FILENO);
+      ::execl(ZORVA_BIN_DIR "/zorva-bmc", "zorva-bmc", "--config", config.c_str(), nullptr);
+      ::_exit(127);
+    }
+    for (int turn = 0; turn < 1500 && ::access(redfish.bmcJson().c_str(), F_OK) != 0; ++turn) {
+      std::this_thread::sleep_for(std::chrono::milliseconds(20));
+    }
+  }
+  ~RunningBmc() { stop(); }
+
+  int stop() {
+    int status = -1;
+    if (process_ <= 0) return status;
+    ::kill(process_, SIGTERM);
+    ::waitpid(process_, &status, 0);
+    process_ = -1;
+    return status;
+  }
+
+  std::string inProc(const std::string& name) const {
+    return contentsOf("/proc/" + std::to_string(process_) + "/" + name);
+  }
+  std::string log() const { return contentsOf(log_); }
+  const std::string& socket() const { return socket_; }
+
+ private:
+  std::string log_;
+  std::string socket_;
+  pid_t process_ = -1;
+};
+
+class ApplyTest : public ::testing::Test {
+ protected:
+  ApplyTest() {
+    // A name that no interface of this machine has.
+    redfish_.tell({{"set", {{kEth0, {{"Id", "zvbmc0"}}}}}});
+    redfish_.directory().write("data/.keep", "");
+    config_ = redfish_.configFile("[agent]\ndata_dir = \"data\"\n[log]\ntarget = \"off\"\n");
+  }
+
+  std::string zorvactl(const std::string& words) const {
+    return outputOf(ZORVA_BIN_DIR "/zorvactl --config " + config_ + " " + words);
+  }
+
+  json interfaceShown() const {
+    const json view = json::parse(zorvactl("show zvbmc0 --output json"));
+    return view["interfaces"][0];
+  }
+
+  testing::TestRedfish redfish_;
+  std::string config_;
+};
+
+TEST_F(ApplyTest, AChangeReachesTheServiceProcessorAndIsTakenBack) {
+  RunningBmc bmc(redfish_, config_);
+  EXPECT_THAT(zorvactl("show zvbmc0"),
+              AllOf(HasSubstr("zvbmc0 (BMC)\n  state      Enabled\n  from       BMC, eth0"), HasSubstr(" s ago")));
+  zorvactl("ifcfg init zvbmc0");
+  EXPECT_THAT(zorvactl("dns set zvbmc0 192.0.2.77"), HasSubstr("192.0.2.77"));
+  EXPECT_THAT(zorvactl("domain zvbmc0 lab.example.org"), HasSubstr("lab.example.org"));
+  EXPECT_THAT(zorvactl("apply zvbmc0 --dry-run"),
+              AllOf(HasSubstr("192.0.2.53 2001:db8::53  ->  192.0.2.77"), HasSubstr("domain_name"),
+                    Not(HasSubstr("applied by"))));
+  EXPECT_EQ(redfish_.tell({{"get", kEth0}})["StaticNameServers"][0], "192.0.2.53") << "a dry run changes nothing";
+  EXPECT_THAT(zorvactl("apply zvbmc0"), HasSubstr("applied by BMC"));
+  EXPECT_EQ(redfish_.tell({{"get", kEth0}})["StaticNameServers"], json::parse(R"(["192.0.2.77", "", "", ""])"));
+  EXPECT_EQ(redfish_.tell({{"get", kEth0}})["FQDN"], "host1-bmc.lab.example.org");
+  EXPECT_THAT(zorvactl("apply 'BMC%zvbmc0'"), HasSubstr("the host has these settings already"));
+  EXPECT_THAT(zorvactl("revert zvbmc0"), HasSubstr("reverted by BMC"));
+  EXPECT_EQ(redfish_.tell({{"get", kEth0}})["NameServers"], json::parse(R"(["192.0.2.53", "2001:db8::53"])"));
+  EXPECT_EQ(redfish_.tell({{"get", kEth0}})["FQDN"], "host1-bmc.mgmt.example.org");
+}
+
+TEST_F(ApplyTest, WithApplyHostTheCommandItselfChangesIt) {
+  config_ = redfish_.configFile("[agent]\ndata_dir = \"data\"\n[tree]\napply = \"host\"\n[log]\ntarget = \"off\"\n");
+  if (::geteuid() != 0) GTEST_SKIP() << "only root applies";
+  RunningBmc bmc(redfish_, config_);
+  zorvactl("ifcfg init zvbmc0");
+  EXPECT_THAT(zorvactl("dns set zvbmc0 192.0.2.78"), HasSubstr("applied by BMC"));
+  EXPECT_EQ(redfish_.tell({{"get", kEth0}})["NameServers"], json::parse(R"(["192.0.2.78"])"));
+  redfish_.tell({{"patch", 400}});
+  EXPECT_THAT(zorvactl("dns set zvbmc0 192.0.2.79"),
+              HasSubstr("The value 192.0.2.1 of StaticNameServers is refused."));
+}
+
+TEST_F(ApplyTest, AServiceProcessorThatIsGoneIsShownWithItsAge) {
+  {
+    RunningBmc bmc(redfish_, config_);
+  }
+  std::string text = contentsOf(redfish_.bmcJson());
+  const std::size_t place = text.find("\"read_at\": ") + 11;
+  text.replace(place, text.find(',', place) - place, std::to_string(std::time(nullptr) - 3 * 3600));
+  redfish_.directory().write("run/bmc.json", text);
+  EXPECT_THAT(zorvactl("show --all"), HasSubstr("Service processor\n  read  3 h ago; what it has now is not known\n"));
+  EXPECT_EQ(interfaceShown()["state"], 0) << "CIM's Unknown";
+  EXPECT_EQ(interfaceShown()["servers"], json::parse(R"(["192.0.2.53", "2001:db8::53"])"));
+  zorvactl("ifcfg init zvbmc0");
+  zorvactl("dns set zvbmc0 192.0.2.77");
+  EXPECT_THAT(zorvactl("apply zvbmc0"), HasSubstr("zorva-bmc does not answer"));
+}
+
+TEST_F(ApplyTest, ThePasswordIsInNoPlaceThatOthersSee) {
+  RunningBmc bmc(redfish_, config_);
+  const std::string secret = testing::kPassword;
+  EXPECT_THAT(bmc.inProc("cmdline"), AllOf(HasSubstr("zorva-bmc"), Not(HasSubstr(secret))));
+  EXPECT_THAT(bmc.inProc("environ"), Not(HasSubstr(secret)));
+  EXPECT_THAT(bmc.inProc("limits"), ::testing::ContainsRegex("Max core file size +0 +0"));
+  EXPECT_THAT(contentsOf(redfish_.bmcJson()), Not(HasSubstr(secret)));
+  struct stat status {};
+  ASSERT_EQ(::stat(bmc.socket().c_str(), &status), 0);
+  EXPECT_EQ(status.st_mode & 0777U, 0600U);
+  EXPECT_EQ(bmc.stop(), 0);
+  EXPECT_THAT(bmc.log(), Not(HasSubstr(secret)));
+  EXPECT_NE(::access(bmc.socket().c_str(), F_OK), 0);
+  EXPECT_THAT(redfish_.requests(), ::testing::Contains(HasSubstr("DELETE")));
+}
+
+}  // namespace
+}  // namespace zorva::bmc
