@@ -264,7 +264,11 @@ TEST_F(ServiceTest, WhatTheServiceSaysOfARefusalIsShownInItsWords) {
   EXPECT_THAT(ask(*writer, {{"action", "write"}, {"servers", {"192.0.2.1"}}})["problem"].get<std::string>(),
               HasSubstr("gave up the change (Exception): The settings could not be stored."));
   redfish_.tell({{"patch", 202}, {"task", "Running"}});
-  EXPECT_THAT(ask(*writer, {{"action", "write"}, {"servers", {"192.0.2.1"}}})["problem"].get<std::string>(),
+  Patience less = kShort;
+  less.change = milliseconds(1500);
+  const auto hasty = service(less);
+  ASSERT_TRUE(hasty->readOnce());
+  EXPECT_THAT(ask(*hasty, {{"action", "write"}, {"servers", {"192.0.2.1"}}})["problem"].get<std::string>(),
               HasSubstr("in time"))
       << "a task without end";
 }

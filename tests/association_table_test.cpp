@@ -1,5 +1,5 @@
-// Compares every association of a host with three interfaces and a service processor with a table that was written by
-// hand. The provider library and the companions are loaded as a CIM server does it, and asked through the broker.
+// Compares every association of a host with three interfaces and its service processor, which zorva-bmc has read, with a
+// table that was written by hand. The provider library and the companions are loaded as a CIM server does it, and asked through the broker.
 
 #include <gmock/gmock.h>
 #include <stdlib.h>
@@ -30,8 +30,11 @@ constexpr const char* kTree = R"({ "system_name": "host1", "nodes": [
       "name": "eth1", "host_name": "host1", "dns_server_addresses": ["192.0.2.53"], "enabled_state": 12,
       "addresses": [ { "address": "198.51.100.7", "prefix_length": 25, "origin": "dhcp" } ] } } ] },
     { "type": "Port", "name": "wlan0", "children": [ { "type": "NetworkIPConfig", "name": "ip", "properties": {
-      "name": "wlan0", "enabled_state": 16 } } ] } ] },
-  { "type": "System", "name": "bmc", "description": "BMC", "children": [
+      "name": "wlan0", "enabled_state": 16 } } ] } ] } ] })";
+
+// What zorva-bmc read.
+constexpr const char* kBmc = R"({ "read_at": 1, "interval": 60, "problem": "", "nodes": [
+  { "type": "System", "name": "bmc.1", "description": "BMC", "children": [
     { "type": "Port", "name": "bmc0", "children": [ { "type": "NetworkIPConfig", "name": "ip", "properties": {
       "name": "bmc0", "host_name": "bmc", "domain_name": "mgmt.example.org", "dns_server_addresses": ["192.0.2.54"],
       "enabled_state": 1,
@@ -114,9 +117,10 @@ class AssociationTable : public ::testing::TestWithParam<Row> {
     directory_ = std::filesystem::temp_directory_path() / ("zorva-associations-" + std::to_string(::getpid()));
     std::filesystem::create_directories(directory_ / "data");
     std::ofstream(directory_ / "tree.json") << kTree;
+    std::ofstream(directory_ / "bmc.json") << kBmc;
     std::ofstream(directory_ / "agent.toml")
         << "[agent]\ndata_dir = \"" << (directory_ / "data").string() << "/\"\n[tree]\nsource = \"file\"\nfile = \""
-        << (directory_ / "tree.json").string() << "\"\n[log]\ntarget = \"off\"\n";
+        << (directory_ / "tree.json").string() << "\"\n[bmc]\nfile = \"" << (directory_ / "bmc.json").string() << "\"\n[log]\ntarget = \"off\"\n";
     ::setenv("ZORVAGENT_CONFIG", (directory_ / "agent.toml").c_str(), 1);
     broker::BrokerOptions options;
     options.providerDirectory = ZORVA_LIB_DIR;
