@@ -193,7 +193,8 @@ bool Runtime::store(const std::string& path, PropertyNumber property, const Prop
   overlayHasChanged();
   const std::string* interface = node->text(ZV::NodeLexicon::PROP_NAME);
   const bool isOfBmc = source->parent(source->parent(*node)).isServiceProcessor();
-  return property == ZV::NodeLexicon::PROP_HOST_NAME || interface == nullptr || reachesHost(isOfBmc ? path : *interface);
+  return property == ZV::NodeLexicon::PROP_HOST_NAME || interface == nullptr ||
+         reachesHost(isOfBmc ? path : *interface);
 } catch (const std::exception& error) {
   ZORVAGENT_LOG_ERROR(path + ": the value is not stored: " + error.what());
   return false;

@@ -21,9 +21,9 @@ using agent::testing::contentsOf;
 using http::testing::outputOf;
 using ::testing::AllOf;
 using ::testing::HasSubstr;
-using ::testing::Not;
 using testing::json;
 using testing::kEth0;
+using ::testing::Not;
 
 /// zorva-bmc as a process, its standard error in a file.
 class RunningBmc : util::NotCopied {
@@ -92,9 +92,8 @@ TEST_F(ApplyTest, AChangeReachesTheServiceProcessorAndIsTakenBack) {
   zorvactl("ifcfg init zvbmc0");
   EXPECT_THAT(zorvactl("dns set zvbmc0 192.0.2.77"), HasSubstr("192.0.2.77"));
   EXPECT_THAT(zorvactl("domain zvbmc0 lab.example.org"), HasSubstr("lab.example.org"));
-  EXPECT_THAT(zorvactl("apply zvbmc0 --dry-run"),
-              AllOf(HasSubstr("192.0.2.53 2001:db8::53  ->  192.0.2.77"), HasSubstr("domain_name"),
-                    Not(HasSubstr("applied by"))));
+  EXPECT_THAT(zorvactl("apply zvbmc0 --dry-run"), AllOf(HasSubstr("192.0.2.53 2001:db8::53  ->  192.0.2.77"),
+                                                        HasSubstr("domain_name"), Not(HasSubstr("applied by"))));
   EXPECT_EQ(redfish_.tell({{"get", kEth0}})["StaticNameServers"][0], "192.0.2.53") << "a dry run changes nothing";
   EXPECT_THAT(zorvactl("apply zvbmc0"), HasSubstr("applied by BMC"));
   EXPECT_EQ(redfish_.tell({{"get", kEth0}})["StaticNameServers"], json::parse(R"(["192.0.2.77", "", "", ""])"));
@@ -113,14 +112,20 @@ TEST_F(ApplyTest, WithApplyHostTheCommandItselfChangesIt) {
   EXPECT_THAT(zorvactl("dns set zvbmc0 192.0.2.78"), HasSubstr("applied by BMC"));
   EXPECT_EQ(redfish_.tell({{"get", kEth0}})["NameServers"], json::parse(R"(["192.0.2.78"])"));
   redfish_.tell({{"patch", 400}});
-  EXPECT_THAT(zorvactl("dns set zvbmc0 192.0.2.79"),
-              HasSubstr("The value 192.0.2.1 of StaticNameServers is refused."));
+  EXPECT_THAT(zorvactl("dns set zvbmc0 192.0.2.79"), HasSubstr("The value 192.0.2.1 of StaticNameServers is refused."));
+}
+
+TEST_F(ApplyTest, AValueOfTheEndpointReachesItThroughTheOverlay) {
+  config_ = redfish_.configFile("[agent]\ndata_dir = \"data\"\n[tree]\napply = \"host\"\n[log]\ntarget = \"off\"\n");
+  if (::geteuid() != 0) GTEST_SKIP() << "only root applies";
+  RunningBmc bmc(redfish_, config_);
+  const std::string endpoint = "'ZORVA_DNSProtocolEndPoint.Name=\"zvbmc0\"'";
+  EXPECT_THAT(zorvactl("modify " + endpoint + " DomainName=lab.example.org"), HasSubstr("lab.example.org"));
+  EXPECT_EQ(redfish_.tell({{"get", kEth0}})["FQDN"], "host1-bmc.lab.example.org");
 }
 
 TEST_F(ApplyTest, AServiceProcessorThatIsGoneIsShownWithItsAge) {
-  {
-    RunningBmc bmc(redfish_, config_);
-  }
+  { RunningBmc bmc(redfish_, config_); }
   std::string text = contentsOf(redfish_.bmcJson());
   const std::size_t place = text.find("\"read_at\": ") + 11;
   text.replace(place, text.find(',', place) - place, std::to_string(std::time(nullptr) - 3 * 3600));

@@ -128,10 +128,12 @@ std::string warningBefore(const Ethernet& now, const WantedDns& wanted) {
   if (wanted.servers && withoutPadding(*wanted.servers) != now.servers()) {
     dropped = now.learnedServers();
     const StringList kept = withoutPadding(*wanted.servers);
-    std::erase_if(dropped, [&](const std::string& each) { return std::find(kept.begin(), kept.end(), each) != kept.end(); });
+    std::erase_if(dropped,
+                  [&](const std::string& each) { return std::find(kept.begin(), kept.end(), each) != kept.end(); });
   }
   if (!dropped.empty()) warning = "the service processor will no longer use what DHCP gave it: " + joined(dropped);
-  const bool dropsDomain = wanted.domain && *wanted.domain != now.domain() && (now.v4.givesDomain() || now.v6.givesDomain());
+  const bool dropsDomain =
+      wanted.domain && *wanted.domain != now.domain() && (now.v4.givesDomain() || now.v6.givesDomain());
   if (dropsDomain) {
     warning += (warning.empty() ? "" : "; ") + std::string("it will no longer take its domain from DHCP");
   }

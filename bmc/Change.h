@@ -17,8 +17,8 @@ struct WantedDns {
   std::optional<std::string> domain;
 };
 
-/// The properties that make these settings the only ones, as they would be in the resource: StaticNameServers, FQDN, and
-/// DHCP's UseDNSServers and UseDomainName. Throws Failed if the interface has no place for them.
+/// The properties that make these settings the only ones, as they would be in the resource: StaticNameServers, FQDN,
+/// and DHCP's UseDNSServers and UseDomainName. Throws Failed if the interface has no place for them.
 JsonValue propertiesFor(const Ethernet& now, const WantedDns& wanted);
 
 /// The same properties as the interface has them, to be brought back later.

@@ -46,9 +46,9 @@ struct OriginName {
   AddressOrigin origin;
 };
 constexpr std::array kOrigins{
-    OriginName{"Static", AddressOrigin::Static},          OriginName{"DHCP", AddressOrigin::Dhcp},
-    OriginName{"BOOTP", AddressOrigin::Dhcp},             OriginName{"DHCPv6", AddressOrigin::Dhcp},
-    OriginName{"SLAAC", AddressOrigin::Slaac},            OriginName{"IPv4LinkLocal", AddressOrigin::LinkLocal},
+    OriginName{"Static", AddressOrigin::Static},       OriginName{"DHCP", AddressOrigin::Dhcp},
+    OriginName{"BOOTP", AddressOrigin::Dhcp},          OriginName{"DHCPv6", AddressOrigin::Dhcp},
+    OriginName{"SLAAC", AddressOrigin::Slaac},         OriginName{"IPv4LinkLocal", AddressOrigin::LinkLocal},
     OriginName{"LinkLocal", AddressOrigin::LinkLocal},
 };
 

@@ -40,10 +40,11 @@ TEST(HostInterface, IsTheAddressAndPortInTheStructureOfType42) {
 }
 
 TEST(HostInterface, OtherStructuresNameNone) {
-  for (const std::string& table : {std::string(), kBios + kEnd, kBios + kEnd + controller(record(1, kIPv4, 443)),
-                                   controller(record(1, kIPv4, 443), 2), controller(record(1, kIPv4, 443), 4, 2),
-                                   controller(record(1, std::string(4, '\0'), 443)), controller(record(1, kIPv4, 0)),
-                                   controller(record(3, kIPv4, 443)), controller(record(1, kIPv4, 443).substr(0, 90))}) {
+  for (const std::string& table :
+       {std::string(), kBios + kEnd, kBios + kEnd + controller(record(1, kIPv4, 443)),
+        controller(record(1, kIPv4, 443), 2), controller(record(1, kIPv4, 443), 4, 2),
+        controller(record(1, std::string(4, '\0'), 443)), controller(record(1, kIPv4, 0)),
+        controller(record(3, kIPv4, 443)), controller(record(1, kIPv4, 443).substr(0, 90))}) {
     EXPECT_EQ(findHostInterface(table), std::nullopt);
   }
   EXPECT_EQ(findHostInterface(controller("short") + controller(record(1, kIPv4, 443))), "https://169.254.0.17:443");

@@ -211,8 +211,8 @@ void Https::fail(const Transfer& transfer, int code) const {
 }
 
 std::string_view Reply::field(std::string_view name) const noexcept {
-  const auto found =
-      std::find_if(fields.rbegin(), fields.rend(), [name](const auto& each) { return util::sameName(each.first, name); });
+  const auto found = std::find_if(fields.rbegin(), fields.rend(),
+                                  [name](const auto& each) { return util::sameName(each.first, name); });
   return found == fields.rend() ? std::string_view() : found->second;
 }
 

@@ -50,8 +50,9 @@ struct Reply {
 inline constexpr std::size_t kLargestBody = std::size_t{4} << 20;
 inline constexpr std::size_t kLargestHead = std::size_t{64} << 10;
 
-/// One server, over a connection that is kept open. TLS 1.2 at least; the certificate is always checked, a fingerprint in
-/// the handshake of the very connection, before anything is sent on it. No proxy, no redirection. Used by one thread.
+/// One server, over a connection that is kept open. TLS 1.2 at least; the certificate is always checked, a fingerprint
+/// in the handshake of the very connection, before anything is sent on it. No proxy, no redirection. Used by one
+/// thread.
 class Https : util::NotCopied {
  public:
   /// The URL has neither path nor login. `interface` is the network interface that requests leave through; empty: any.

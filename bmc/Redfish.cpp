@@ -54,7 +54,8 @@ void addMessages(const JsonValue* messages, std::string& line) {
     const std::string resolution = textIn(message, "Resolution");
     if (text.empty()) continue;
     line += (line.empty() ? "" : "; ") + shortLine(text);
-    if (!resolution.empty() && resolution != "None" && resolution != "None.") line += " (" + shortLine(resolution) + ")";
+    if (!resolution.empty() && resolution != "None" && resolution != "None.")
+      line += " (" + shortLine(resolution) + ")";
   }
 }
 

@@ -101,7 +101,7 @@ class Redfish : util::NotCopied {
   int requestsLeft_ = kMostRequests;
   std::optional<JsonValue> root_;
   std::string token_;
-  std::string session_;  ///< the path of the session
+  std::string session_;                          ///< the path of the session
   std::shared_ptr<const util::Secret> refused_;  ///< the password that the service did not accept
   Clock::time_point refusedUntil_;
   std::map<std::string, Cached> cache_;  ///< by path

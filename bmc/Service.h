@@ -37,8 +37,8 @@ class Service : util::NotCopied {
   /// Takes the last state from the file, if there is one. The directory of the file must exist.
   Service(const agent::BmcConfig& config, Target target, Patience patience = {});
 
-  /// Reads once and replaces the file. False, with a line on standard error, if the service processor could not be read;
-  /// then the file keeps what was read before.
+  /// Reads once and replaces the file. False, with a line on standard error, if the service processor could not be
+  /// read; then the file keeps what was read before.
   bool readOnce();
 
   /// Listens for the agent, and reads at each interval, until stop().

@@ -19,9 +19,9 @@ using std::chrono::milliseconds;
 using ::testing::AllOf;
 using ::testing::Contains;
 using ::testing::HasSubstr;
-using ::testing::Not;
 using testing::json;
 using testing::kEth0;
+using ::testing::Not;
 using testing::TestRedfish;
 
 constexpr Patience kShort{milliseconds(1500), milliseconds(6000), milliseconds(300)};
@@ -130,12 +130,12 @@ TEST_F(ServiceTest, WhateverGoesWrongTheLastStateStaysWithItsAge) {
   ASSERT_TRUE(reader->readOnce());
   const agent::BmcState before = state();
   const std::vector<std::pair<std::string, std::string>> cases{
-      {"html", "cannot be read"},         {"deep", "nested more than 32 deep"},
-      {"values", "more than 100000"},     {"huge", "too large"},
-      {"list", "no JSON object"},         {"head", "too large"},
-      {"trickle", "no answer"},           {"silent", "no answer"},
-      {"far", "sends elsewhere"},         {"loop", "redirects without end"},
-      {"redirect", "answers 404"},        {"outside", "a resource that is none"},
+      {"html", "cannot be read"},      {"deep", "nested more than 32 deep"},
+      {"values", "more than 100000"},  {"huge", "too large"},
+      {"list", "no JSON object"},      {"head", "too large"},
+      {"trickle", "no answer"},        {"silent", "no answer"},
+      {"far", "sends elsewhere"},      {"loop", "redirects without end"},
+      {"redirect", "answers 404"},     {"outside", "a resource that is none"},
       {"busy", "The service is busy."}};
   for (const auto& [wrong, problem] : cases) {
     redfish_.tell({{"wrong", wrong}});
@@ -302,6 +302,60 @@ TEST_F(ServiceTest, AnInterfaceWithoutFqdnHasNoDomainAndCannotBeGivenOne) {
   EXPECT_EQ(nodeOf(state(), "/bmc.1/eth0/ip")->text(PROP_DOMAIN_NAME), nullptr);
   EXPECT_THAT(ask(*writer, {{"action", "read"}, {"domain", "example.net"}})["problem"].get<std::string>(),
               HasSubstr("has no FQDN"));
+}
+
+TEST_F(ServiceTest, SeveralManagersWithInterfacesOfOneNameHavePathsOfTheirOwn) {
+  const std::string second = "/redfish/v1/Managers/2";
+  const json eth0 = redfish_.tell({{"get", kEth0}});
+  json manager = redfish_.tell({{"get", "/redfish/v1/Managers/1"}});
+  manager["EthernetInterfaces"]["@odata.id"] = second + "/EthernetInterfaces";
+  json interfaces = redfish_.tell({{"get", "/redfish/v1/Managers/1/EthernetInterfaces"}});
+  interfaces["Members"] = json::parse(R"([{"@odata.id": "/redfish/v1/Managers/2/EthernetInterfaces/a"},
+                                          {"@odata.id": "/redfish/v1/Managers/2/EthernetInterfaces/b"}])");
+  json set{{second, manager}, {second + "/EthernetInterfaces", interfaces}};
+  for (const char* name : {"/EthernetInterfaces/a", "/EthernetInterfaces/b"}) set[second + name] = eth0;
+  for (auto& [path, body] : set.items()) body["@odata.id"] = path;
+  json both = json::parse(R"([{"@odata.id": "/redfish/v1/Managers/1"}, {"@odata.id": "/redfish/v1/Managers/2"}])");
+  set["/redfish/v1/Managers"] = {{"Members", both}, {"Members@odata.count", 2}};
+  redfish_.tell({{"set", set}});
+  ASSERT_TRUE(service()->readOnce());
+  const agent::BmcState now = state();
+  for (const char* path : {"/bmc.1/eth0/ip", "/bmc.1~2/eth0/ip", "/bmc.1~2/eth0~2/ip"}) {
+    ASSERT_NE(nodeOf(now, path), nullptr) << path;
+    EXPECT_EQ(*nodeOf(now, path)->text(PROP_NAME), "eth0") << "names are as they are";
+  }
+}
+
+TEST_F(ServiceTest, AChangeGoesToTheSettingsObjectWhereTheInterfaceNamesOne) {
+  const std::string settings = std::string(kEth0) + "/SD";
+  json body = redfish_.tell({{"get", kEth0}});
+  body["@odata.id"] = settings;
+  redfish_.tell({{"set", {{settings, body}}}});
+  redfish_.tell(
+      {{"set",
+        {{kEth0,
+          {{"@Redfish.Settings",
+            {{"@odata.type", "#Settings.v1_4_0.Settings"}, {"SettingsObject", {{"@odata.id", settings}}}}}}}}}});
+  const auto writer = service(kShort);
+  ASSERT_TRUE(writer->readOnce());
+  ask(*writer, {{"action", "write"}, {"servers", {"192.0.2.1"}}});
+  EXPECT_EQ(patches()[0]["path"], settings);
+}
+
+TEST_F(ServiceTest, WhatIsNoAddressOrNoNameIsLeftOut) {
+  redfish_.tell({{"set",
+                  {{kEth0,
+                    {{"NameServers", {"0.0.0.0", "names.example.org", "::", "", "192.0.2.1", "192.0.2.1", "fe80::53"}},
+                     {"HostName", "a\nb"},
+                     {"FQDN", "host1..example.org"},
+                     {"InterfaceEnabled", false}}}}}});
+  ASSERT_TRUE(service()->readOnce());
+  const agent::BmcState now = state();
+  const Node& eth0 = *nodeOf(now, "/bmc.1/eth0/ip");
+  EXPECT_EQ(*eth0.list(PROP_DNS_SERVER_ADDRESSES), (StringList{"192.0.2.1", "fe80::53%eth0"}));
+  EXPECT_EQ(eth0.text(PROP_HOST_NAME), nullptr);
+  EXPECT_EQ(eth0.text(PROP_DOMAIN_NAME), nullptr);
+  EXPECT_EQ(*eth0.number(PROP_ENABLED_STATE), 16U);
 }
 
 TEST_F(ServiceTest, OnlyInterfacesThatWereReadCanBeChanged) {

@@ -1,5 +1,6 @@
-// Compares every association of a host with three interfaces and its service processor, which zorva-bmc has read, with a
-// table that was written by hand. The provider library and the companions are loaded as a CIM server does it, and asked through the broker.
+// Compares every association of a host with three interfaces and its service processor, which zorva-bmc has read, with
+// a table that was written by hand. The provider library and the companions are loaded as a CIM server does it, and
+// asked through the broker.
 
 #include <gmock/gmock.h>
 #include <stdlib.h>
@@ -120,7 +121,8 @@ class AssociationTable : public ::testing::TestWithParam<Row> {
     std::ofstream(directory_ / "bmc.json") << kBmc;
     std::ofstream(directory_ / "agent.toml")
         << "[agent]\ndata_dir = \"" << (directory_ / "data").string() << "/\"\n[tree]\nsource = \"file\"\nfile = \""
-        << (directory_ / "tree.json").string() << "\"\n[bmc]\nfile = \"" << (directory_ / "bmc.json").string() << "\"\n[log]\ntarget = \"off\"\n";
+        << (directory_ / "tree.json").string() << "\"\n[bmc]\nfile = \"" << (directory_ / "bmc.json").string()
+        << "\"\n[log]\ntarget = \"off\"\n";
     ::setenv("ZORVAGENT_CONFIG", (directory_ / "agent.toml").c_str(), 1);
     broker::BrokerOptions options;
     options.providerDirectory = ZORVA_LIB_DIR;

@@ -1,6 +1,6 @@
-// The writer of a service processor's settings. zorva-bmc carries the change out: it has the session, the password and the
-// right to use the network. A request and its answer are JSON objects over a Unix socket; each ends where its sender
-// stops writing.
+// The writer of a service processor's settings. zorva-bmc carries the change out: it has the session, the password and
+// the right to use the network. A request and its answer are JSON objects over a Unix socket; each ends where its
+// sender stops writing.
 
 #include <poll.h>
 #include <sys/socket.h>

@@ -29,7 +29,8 @@ struct DnsTarget {
 /// Why an owner was not changed: one line that names the owner and the next step of a person.
 using Refusal = std::string;
 
-/// One for each owner. Calls wait for the owner, 10 s at most each; for a service processor 75 s. Belongs to one thread.
+/// One for each owner. Calls wait for the owner, 10 s at most each; for a service processor 75 s. Belongs to one
+/// thread.
 class DnsWriter {
  public:
   virtual ~DnsWriter() = default;

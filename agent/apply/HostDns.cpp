@@ -113,7 +113,8 @@ std::vector<HostInterface> HostDns::named(const std::string& name) const {
   std::vector<HostInterface> found;
   for (HostInterface& interface : interfaces()) {
     const Node& node = *nodeOf(interface);
-    const bool isOfBmc = interface.isOfBmc && textOf(node, PROP_NAME) == (name.starts_with("BMC%") ? name.substr(4) : "");
+    const bool isOfBmc =
+        interface.isOfBmc && textOf(node, PROP_NAME) == (name.starts_with("BMC%") ? name.substr(4) : "");
     if (interface.name == name || interface.settingsName == name || isOfBmc) found.push_back(std::move(interface));
   }
   return found;

@@ -121,11 +121,12 @@ Expected<WantedSettings, std::string> readWanted(const std::string& dataDir, con
                                                  const OverlayValues& overlay, const std::string& path) {
   WantedSettings wanted;
   const std::string file = settingsFileOf(dataDir, interface);
-  const int error = interface.empty() ? ENOENT : readKeyValues(file, [&wanted](std::string_view key, std::string_view value) {
-    if (key == "DNSSERVERS") takeFirst(wanted.servers, splitAtBlanks(value));
-    if (key == "DNSSUFFIXES") takeFirst(wanted.suffixes, splitAtBlanks(value));
-    if (key == "DOMAINNAME") takeFirst(wanted.domain, std::string(value));
-  });
+  const int error =
+      interface.empty() ? ENOENT : readKeyValues(file, [&wanted](std::string_view key, std::string_view value) {
+        if (key == "DNSSERVERS") takeFirst(wanted.servers, splitAtBlanks(value));
+        if (key == "DNSSUFFIXES") takeFirst(wanted.suffixes, splitAtBlanks(value));
+        if (key == "DOMAINNAME") takeFirst(wanted.domain, std::string(value));
+      });
   if (error != 0 && error != ENOENT) return unexpected(file + ": cannot be read: " + util::fileErrorText(error));
   const auto values = overlay.find(path);
   if (values == overlay.end()) return wanted;

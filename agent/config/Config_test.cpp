@@ -130,6 +130,39 @@ TEST_F(ConfigTest, SettingsAreAppliedToTheHostOnlyWhereThatIsAskedFor) {
             "agent.toml:4: tree.apply: \"host\" needs source = \"host\" as well");
 }
 
+TEST_F(ConfigTest, TheServiceProcessorIsReadAndItsLoginIsChecked) {
+  EXPECT_EQ(read("").bmc.file, "/run/zorvagent/bmc.json");
+  EXPECT_EQ(read("").bmc.interval, 60);
+  EXPECT_EQ(read("[tree]\nsource = \"file\"\nfile = \"tree.json\"\n").bmc.file, "") << "such a tree is whole";
+  const BmcConfig bmc =
+      read(
+          "[bmc]\nurl = \"https://192.0.2.20:8443/\"\nuser = \"operator\"\npassword_file = \"secret\"\n"
+          "fingerprint = \"AB:" +
+          std::string(62, '0') + "\"\ninterval = 30\nfile = \"run/bmc.json\"\n")
+          .bmc;
+  EXPECT_EQ(bmc.url, "https://192.0.2.20:8443");
+  EXPECT_EQ(bmc.passwordFile, directory_ / "secret");
+  EXPECT_EQ(bmc.fingerprint, "ab" + std::string(62, '0'));
+  EXPECT_EQ(bmc.interval, 30);
+  EXPECT_EQ(bmc.file, directory_ / "run/bmc.json");
+  const std::string login = "user = \"a\"\npassword_file = \"b\"\n";
+  const Cases cases = {
+      {"[bmc]\nurl = \"http://192.0.2.20\"\n", "agent.toml:2: bmc.url: expected https://HOST or https://HOST:PORT"},
+      {"[bmc]\nurl = \"https://\"\n", "agent.toml:2: bmc.url: expected https://HOST or https://HOST:PORT"},
+      {"[bmc]\nurl = \"https://a:b@192.0.2.20\"\n",
+       "agent.toml:2: bmc.url: must not hold a login; user and password_file do"},
+      {"[bmc]\nurl = \"https://192.0.2.20/redfish\"\n", "agent.toml:2: bmc.url: must not hold a path"},
+      {"[bmc]\nurl = \"https://192.0.2.20\"\n", "agent.toml:2: bmc.url: needs user and password_file as well"},
+      {"[bmc]\nuser = \"a\"\n", "agent.toml:2: bmc.user: and password_file need each other"},
+      {"[bmc]\n" + login + "fingerprint = \"12\"\n",
+       "agent.toml:4: bmc.fingerprint: expected the SHA-256 of a certificate: 64 hexadecimal digits"},
+      {"[bmc]\n" + login + "fingerprint = \"" + std::string(64, '1') + "\"\nca_file = \"c\"\n",
+       "agent.toml:4: bmc.fingerprint: and ca_file exclude each other"},
+      {"[bmc]\ninterval = 1\n", "agent.toml:2: bmc.interval: must be from 5 to 86400"},
+  };
+  for (const auto& [text, error] : cases) EXPECT_EQ(wrong(text), error) << text;
+}
+
 TEST_F(ConfigTest, WhatIsNoTomlIsNamedWithItsLine) {
   EXPECT_TRUE(wrong("[agent]\ndata_dir = \n").starts_with("agent.toml:2: ")) << wrong("[agent]\ndata_dir = \n");
   EXPECT_TRUE(wrong("[agent]\n[agent]\n").starts_with("agent.toml:2: "));

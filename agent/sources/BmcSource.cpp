@@ -112,7 +112,8 @@ std::shared_ptr<const TreeSnapshot> BmcSource::merged() const {
   std::vector<const Node*> after;
   for (const Node* system : state_.tree->children(state_.tree->root())) {
     const std::set<std::string> own = interfaceNames(*state_.tree, *system);
-    const bool collides = std::any_of(own.begin(), own.end(), [&](const std::string& name) { return names.contains(name); });
+    const bool collides =
+        std::any_of(own.begin(), own.end(), [&](const std::string& name) { return names.contains(name); });
     (collides ? before : after).push_back(system);
   }
   try {

@@ -13,8 +13,8 @@
 
 namespace zorva::agent {
 
-/// Adds the nodes of the file that zorva-bmc keeps to the tree of another source. A file that is not there adds none. One
-/// that is wrong adds none either, and the reason is logged once. So the host's own tree never depends on it.
+/// Adds the nodes of the file that zorva-bmc keeps to the tree of another source. A file that is not there adds none.
+/// One that is wrong adds none either, and the reason is logged once. So the host's own tree never depends on it.
 ///
 /// What was read more than ten intervals ago counts as unknown: the nodes then have no enabled state, so that CIM says
 /// "Unknown". Their other values stay, with the time at which they were read.

@@ -11,10 +11,10 @@ namespace zorva::agent {
 namespace {
 
 using namespace ZV::NodeLexicon;
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
 using std::chrono::seconds;
 using std::chrono::system_clock;
+using ::testing::ElementsAre;
+using ::testing::HasSubstr;
 using testing::LogLines;
 using testing::TemporaryDirectory;
 

@@ -15,9 +15,9 @@ inline constexpr std::uint64_t kBmcIntervals = 10;
 
 /// What was read, and when.
 struct BmcState {
-  std::uint64_t readAt = 0;     ///< seconds since 1970; 0: nothing was read yet
-  std::uint64_t interval = 60;  ///< seconds from one reading to the next
-  std::string problem;          ///< why the latest reading failed, one line; empty if it did not
+  std::uint64_t readAt = 0;                  ///< seconds since 1970; 0: nothing was read yet
+  std::uint64_t interval = 60;               ///< seconds from one reading to the next
+  std::string problem;                       ///< why the latest reading failed, one line; empty if it did not
   std::shared_ptr<const TreeSnapshot> tree;  ///< the service processors; never null in a state that was read
 
   /// Whether what was read is so old that it counts as unknown. A clock that was set back makes nothing old.
@@ -33,8 +33,8 @@ inline constexpr std::size_t kMostBmcInterfaces = 1024;
 
 std::string formatBmcState(const BmcState& state);
 
-/// Throws ConfigError, under the file's name and with line and key, if it cannot be read or holds anything but the nodes
-/// of service processors.
+/// Throws ConfigError, under the file's name and with line and key, if it cannot be read or holds anything but the
+/// nodes of service processors.
 BmcState readBmcState(const std::string& path);
 BmcState parseBmcState(const std::string& text, const std::string& name);
 

@@ -7,8 +7,8 @@
 #include <optional>
 #include <string>
 
-#include "util/Secret.h"
 #include "cli/operations/ServerUrl.h"
+#include "util/Secret.h"
 
 namespace zorva::cli {
 

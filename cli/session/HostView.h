@@ -96,8 +96,8 @@ struct HostRow {
 
 /// When the service processor was read. Its interfaces are as of then.
 struct BmcReading {
-  std::uint64_t at = 0;   ///< seconds since 1970
-  std::uint64_t age = 0;  ///< seconds
+  std::uint64_t at = 0;    ///< seconds since 1970
+  std::uint64_t age = 0;   ///< seconds
   bool isUnknown = false;  ///< so long ago that nobody knows what it has now
   std::string problem;     ///< why the latest reading failed; empty if it did not
 
