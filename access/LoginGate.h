@@ -25,7 +25,7 @@
 namespace zorva::access {
 
 struct LoginOptions {
-  std::string usersFile = kDefaultUsersFile;
+  std::string usersFile = defaultUsersFile();
   Role anonymous = Role::Read;        ///< of clients without a login, on loopback addresses
   std::string group = kDefaultGroup;  ///< its members operate over the Unix socket
   Role otherLocal = Role::Read;       ///< of all other local users there

@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "access/LocalUsers.h"
+#include "util/InstalledPlaces.h"
 #include "util/ReadFile.h"
 #include "util/ReplaceFile.h"
 
@@ -28,6 +29,8 @@ struct stat rightsOfNewFile(const std::string& group) {
 }
 
 }  // namespace
+
+std::string defaultUsersFile() { return util::installedPlaces().config + "users"; }
 
 Users readUsersFile(const std::string& path) {
   const util::FileText file = util::readFile(path, Users::kLargest);

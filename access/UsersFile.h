@@ -15,8 +15,10 @@
 
 namespace zorva::access {
 
-inline constexpr const char* kDefaultUsersFile = "/etc/zorvagent/users";
 inline constexpr const char* kDefaultGroup = "zorva";
+
+/// The file of users of this installation: /etc/zorvagent/users.
+std::string defaultUsersFile();
 
 /// Reads the file; a file that does not exist has no users. Throws UsersError.
 Users readUsersFile(const std::string& path);

@@ -70,12 +70,6 @@ function(zorva_limit_exports target file)
   target_compile_options(${target} PRIVATE $<$<CXX_COMPILER_ID:GNU>:-fno-gnu-unique>)
 endfunction()
 
-# zorva_install_library(TARGET): installs a shared library, which finds the other libraries in its own directory.
-function(zorva_install_library target)
-  set_target_properties(${target} PROPERTIES INSTALL_RPATH "$ORIGIN")
-  install(TARGETS ${target} LIBRARY NAMELINK_SKIP)
-endfunction()
-
 # Headers that many sources include are compiled once for all of them. A build without tests does without, so it shows
 # whether each source includes all that it uses.
 option(ZORVA_PRECOMPILE "Precompile the standard library's and GoogleTest's headers" ${ZORVA_BUILD_TESTS})

@@ -7,6 +7,8 @@ build_packages=(g++ cmake ninja-build pkg-config python3-minimal libspdlog-dev l
   zlib1g-dev libpugixml-dev libcurl4-openssl-dev libexpected-dev)
 test_packages=(python3 python3-jsonschema jq git libgtest-dev libgmock-dev binutils iproute2 libxml2-utils sblim-wbemcli curl openssl clang)
 clang_packages=(clang clang-tidy)
+deb_packages=(debhelper dpkg-dev)
+deb_test_packages=(debootstrap iproute2 lintian)
 bench_packages=(python3 libbenchmark-dev iproute2 wrk)
 
 die() {
@@ -72,15 +74,23 @@ build() {
   if [ "$(ninja -C build/"$preset" -n "$@" 2>/dev/null | tail -n 1)" != 'ninja: no work to do.' ]; then
     need_room 1000
     printf 'Building %s (the first time takes some minutes)\n' "$preset" >&2
-    if [ -t 2 ]; then
-      ninja -C build/"$preset" "$@" 2>&1 | tee "$log" | sed -un 's/^\(\[[0-9/]*\]\).*/\r\1 /p' | tr -d '\n' >&2
-      [ "${PIPESTATUS[0]}" -eq 0 ] || build_failed "$log"
-      printf '\n' >&2
-    else
-      ninja -C build/"$preset" "$@" >"$log" 2>&1 || build_failed "$log"
-    fi
+    with_progress "$log" ninja -C build/"$preset" "$@" || build_failed "$log"
   fi
   exec 9>&-
+}
+
+# with_progress LOG COMMAND...: runs it with its output in LOG; a terminal shows how far ninja is.
+with_progress() {
+  local log=$1 status
+  shift
+  if [ ! -t 2 ]; then
+    "$@" >"$log" 2>&1
+    return
+  fi
+  "$@" 2>&1 | tee "$log" | sed -un 's/^\(\[[0-9/]*\]\).*/\r\1 /p' | tr -d '\n' >&2
+  status=${PIPESTATUS[0]}
+  printf '\n' >&2
+  return "$status"
 }
 
 build_failed() {

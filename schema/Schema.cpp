@@ -25,7 +25,7 @@ std::string_view withoutSlashes(std::string_view name) noexcept {
 
 }  // namespace
 
-std::shared_ptr<const ClassRepository> loadBuiltInClasses(ClassSet set) {
+std::shared_ptr<ClassRepository> loadBuiltInClasses(ClassSet set) {
   auto classes = std::make_shared<ClassRepository>();
   RepositorySink sink(*classes);
   const MofInclude top = builtInFile(set == ClassSet::Interop ? "interop.mof" : "profile.mof");

@@ -16,9 +16,9 @@ enum class ClassSet {
             ///< profiles
 };
 
-/// The built-in classes, read again at each call, so keep the result. The built-in text is valid (a test reads it); if
-/// it were not, the call would throw std::logic_error. Safe on any thread.
-std::shared_ptr<const ClassRepository> loadBuiltInClasses(ClassSet set = ClassSet::Profile);
+/// The built-in classes, read again at each call, so keep the result. The caller may add others. The built-in text is
+/// valid (a test reads it); if it were not, the call would throw std::logic_error. Safe on any thread.
+std::shared_ptr<ClassRepository> loadBuiltInClasses(ClassSet set = ClassSet::Profile);
 
 /// Namespaces are compared without regard to case and to slashes at either end.
 bool sameNamespace(std::string_view a, std::string_view b) noexcept;

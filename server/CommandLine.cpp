@@ -42,6 +42,9 @@ void addOptions(CLI::App& app, CommandLine& line) {
                  "The agent's configuration (default: $ZORVAGENT_CONFIG, else /etc/zorvagent/agent.toml)")
       ->type_name("FILE");
   app.add_option("--provider-dir", line.providerDirectory, "Where the provider libraries lie")->type_name("DIR");
+  app.add_option("--providers", line.addedProviders,
+                 "Further providers: the files .reg and .mof of a directory (default: /etc/zorvagent/providers.d)")
+      ->type_name("DIR");
   app.add_flag("--check-config", line.checkConfig, "Tell whether the configuration is good, and end");
   app.add_flag("--make-certificate", line.makeCertificate,
                "Write a self-signed certificate for HTTPS and its key, print its fingerprint, and end");
@@ -79,6 +82,7 @@ Config configOf(const CommandLine& line) {
   if (line.anonymous.has_value()) config.access.anonymous = access::roleOf(*line.anonymous).value();
   if (!line.agentConfig.empty()) config.agentConfig = absolute(line.agentConfig);
   if (!line.providerDirectory.empty()) config.providerDirectory = absolute(line.providerDirectory);
+  if (!line.addedProviders.empty()) config.addedProviders = absolute(line.addedProviders);
   if (config.addresses.has_value()) http::checkAddresses(*config.addresses);
   if (config.tlsAddresses.has_value()) http::checkAddresses(*config.tlsAddresses, http::Door::Https);
   return config;

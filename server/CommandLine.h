@@ -18,6 +18,7 @@ struct CommandLine {
   std::optional<std::string> anonymous;  ///< the word of a role
   std::string agentConfig;
   std::string providerDirectory;
+  std::string addedProviders;
   bool checkConfig = false;      ///< read the configuration, report whether it is valid, and end
   bool makeCertificate = false;  ///< write a self-signed certificate, and end
   bool greet = false;            ///< print on standard output how to send this server a request

@@ -7,6 +7,7 @@
 #include <filesystem>
 #include <utility>
 
+#include "util/InstalledPlaces.h"
 #include "util/ReadFile.h"
 #include "util/Toml.h"
 
@@ -16,7 +17,6 @@ using zorva::agent::ConfigError;
 
 namespace {
 
-constexpr const char* kDefaultFile = "/etc/zorvagent/zorvacimd.toml";
 constexpr std::size_t kLargestFile = std::size_t{256} << 10;
 constexpr int kLongestSeconds = 24 * 60 * 60;
 
@@ -187,8 +187,9 @@ Config parseConfig(const std::string& path, const std::string& text) try {
 Config readConfig(const std::string& path) { return parseConfig(path, contentsOf(path)); }
 
 Config readDefaultConfig() {
-  const bool absent = ::access(kDefaultFile, F_OK) != 0 && errno == ENOENT;
-  return absent ? Config() : readConfig(kDefaultFile);
+  const std::string file = util::installedPlaces().config + "zorvacimd.toml";
+  const bool absent = ::access(file.c_str(), F_OK) != 0 && errno == ENOENT;
+  return absent ? Config() : readConfig(file);
 }
 
 }  // namespace zorva::server

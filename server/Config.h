@@ -9,6 +9,7 @@
 
 #include "access/LoginGate.h"
 #include "agent/config/Config.h"
+#include "frontend/AddedProviders.h"
 #include "http/HttpLimits.h"
 #include "http/Listener.h"
 #include "http/TlsIdentity.h"
@@ -51,6 +52,8 @@ struct Config {
   std::string agentConfig;        ///< the agent's own configuration file; empty: the agent's default
   std::string providerDirectory;  ///< empty: beside the program
 
+  std::string addedProviders = frontend::usualProviders();  ///< a directory of further providers
+
   /// [access]
   access::LoginOptions access;
 
@@ -66,8 +69,8 @@ struct Config {
 /// zorva::agent::ConfigError, which names file, line and key, for every error, also for a file that cannot be read.
 Config readConfig(const std::string& path);
 
-/// The configuration if no file is named: /etc/zorvagent/zorvacimd.toml, or the built-in defaults if it does not exist.
-/// Throws as readConfig does.
+/// The configuration if no file is named: zorvacimd.toml of this installation (/etc/zorvagent/zorvacimd.toml), or the
+/// built-in defaults if it does not exist. Throws as readConfig does.
 Config readDefaultConfig();
 
 }  // namespace zorva::server

@@ -26,6 +26,7 @@
 #include "agent/Agent.h"
 #include "cimom/Interop.h"
 #include "cimom/Service.h"
+#include "frontend/AddedProviders.h"
 #include "frontend/SettingsClaims.h"
 #include "http/HttpServer.h"
 #include "http/Listener.h"
@@ -314,6 +315,15 @@ void tryLog(const Config& config) {
   ::unlink(target.c_str());
 }
 
+template <typename Step>
+void attempt(std::vector<std::string>& problems, const std::string& what, Step&& step) {
+  try {
+    step();
+  } catch (const std::exception& error) {
+    problems.push_back(what + error.what());
+  }
+}
+
 void tryProviders(const Config& config, const MakeBroker& makeBroker, std::vector<std::string>& problems) {
   const std::string& directory = config.providerDirectory;
   std::error_code error;
@@ -322,7 +332,9 @@ void tryProviders(const Config& config, const MakeBroker& makeBroker, std::vecto
     problems.push_back("agent.provider_dir: " + directory + ": " + error.message());
     return;
   }
-  for (std::string& each : makeBroker(config)->openLibraries()) problems.push_back(std::move(each));
+  attempt(problems, "", [&] {
+    for (std::string& each : makeBroker(config)->openLibraries()) problems.push_back(std::move(each));
+  });
 }
 
 /// Reads the certificate and warns if it expires soon.
@@ -330,15 +342,6 @@ void tryCertificate(const Config& config) {
   if (config.tls.certificate.empty()) return;
   const auto warning = expiryWarning(*http::TlsIdentity::load(config.tls), std::time(nullptr));
   if (warning.has_value()) tellError("warning: " + *warning);
-}
-
-template <typename Step>
-void attempt(std::vector<std::string>& problems, const std::string& what, Step&& step) {
-  try {
-    step();
-  } catch (const std::exception& error) {
-    problems.push_back(what + error.what());
-  }
 }
 
 /// Reads and opens what a start would, and reports all errors.
@@ -386,8 +389,10 @@ std::unique_ptr<broker::Broker> makeBuiltInBroker(const Config& config) {
       config.providerDirectory.empty() ? broker::ProviderRegistry::builtInDirectory() : config.providerDirectory;
   options.log = logBrokerLine;
   options.claim = frontend::SettingsClaims().hook();
+  const auto classes = schema::loadBuiltInClasses(schema::ClassSet::Interop);
+  frontend::addProviders(config.addedProviders, options.registry, *classes);
   cimom::serveInterop(options);
-  return std::make_unique<broker::Broker>(schema::loadBuiltInClasses(schema::ClassSet::Interop), std::move(options));
+  return std::make_unique<broker::Broker>(classes, std::move(options));
 }
 
 int runServer(int argc, const char* const* argv, const MakeBroker& makeBroker) {

@@ -8,6 +8,7 @@
 
 #include "server/CertificateInUse.h"
 #include "server/SelfSigned.h"
+#include "util/InstalledPlaces.h"
 #include "util/Names.h"
 #include "util/ServiceHost.h"
 
@@ -15,8 +16,6 @@ namespace zorva::server {
 
 namespace {
 
-constexpr const char* kCertificate = "/etc/zorvagent/tls/server.crt";
-constexpr const char* kKey = "/etc/zorvagent/tls/server.key";
 constexpr unsigned int kForAll = 0644;
 constexpr unsigned int kForGroup = 0640;
 
@@ -51,7 +50,7 @@ std::string nextSteps(const Config& config, const http::TlsFiles& files, const s
                       const std::string& fingerprint) {
   std::string text = "\nNext:\n";
   if (config.tls.certificate.empty()) {
-    const std::string file = config.file.empty() ? "/etc/zorvagent/zorvacimd.toml" : config.file;
+    const std::string file = config.file.empty() ? util::installedPlaces().config + "zorvacimd.toml" : config.file;
     text += "  name the files in " + file + ":\n    [tls]\n    certificate = \"" + files.certificate +
             "\"\n    key = \"" + files.key +
             "\"\n    addresses = [\"0.0.0.0\", \"::\"]    # without this line, only this host reaches it\n";
@@ -66,7 +65,8 @@ std::string nextSteps(const Config& config, const http::TlsFiles& files, const s
 
 void makeCertificate(const Config& config) {
   http::TlsFiles files = config.tls;
-  if (files.certificate.empty()) files = {kCertificate, kKey, {}};
+  const std::string tls = util::installedPlaces().config + "tls/";
+  if (files.certificate.empty()) files = {tls + "server.crt", tls + "server.key", {}};
   const std::vector<std::string> names = namesOf(config);
   const std::time_t now = std::time(nullptr);
   const SelfSigned made = makeSelfSigned(names, now);

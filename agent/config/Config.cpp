@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <cerrno>
 
+#include "util/InstalledPlaces.h"
 #include "util/Names.h"
 #include "util/ReadFile.h"
 #include "util/Toml.h"
@@ -13,7 +14,6 @@
 namespace zorva::agent {
 namespace {
 
-constexpr const char* kDefaultFile = "/etc/zorvagent/agent.toml";
 constexpr std::size_t kLargestFile = std::size_t{256} << 10;
 
 void readAgent(Config& config, const util::TomlDocument& document) {
@@ -142,8 +142,9 @@ Config readDefaultConfig() {
   // A set-user-id program does not use the environment.
   const char* named = ::secure_getenv("ZORVAGENT_CONFIG");
   if (named != nullptr && *named != '\0') return readConfig(named);
-  const bool absent = ::access(kDefaultFile, F_OK) != 0 && errno == ENOENT;
-  return absent ? parseConfig({}, {}) : readConfig(kDefaultFile);
+  const std::string file = util::installedPlaces().config + "agent.toml";
+  const bool absent = ::access(file.c_str(), F_OK) != 0 && errno == ENOENT;
+  return absent ? parseConfig({}, {}) : readConfig(file);
 }
 
 }  // namespace zorva::agent

@@ -6,6 +6,7 @@
 #include <string>
 
 #include "agent/interface/AgentApi.h"
+#include "util/InstalledPlaces.h"
 #include "util/LogLevels.h"
 
 namespace zorva::agent {
@@ -31,9 +32,6 @@ class ZORVA_AGENT_API ConfigError : public std::runtime_error {
   std::string problem_;
 };
 
-/// The default directory for values that were set.
-inline constexpr const char* kDefaultDataDir = "/var/lib/zorvagent/";
-
 /// [bmc]: the service processor that zorva-bmc asks.
 struct BmcConfig {
   std::string url;           ///< "https://HOST[:PORT]"; empty: the one that the firmware names
@@ -53,8 +51,8 @@ struct Config {
   std::string file;  ///< the file; empty for the built-in defaults
 
   /// [agent]
-  std::string dataDir = kDefaultDataDir;  ///< ends in a slash
-  std::string systemName;                 ///< empty: the name from the tree's source
+  std::string dataDir = util::installedPlaces().data;  ///< ends in a slash
+  std::string systemName;                              ///< empty: the name from the tree's source
   std::string language = "en";
 
   /// [tree]
@@ -77,7 +75,8 @@ struct Config {
 ZORVA_AGENT_API Config readConfig(const std::string& path);
 
 /// The configuration that the environment selects: the file that ZORVAGENT_CONFIG names, else
-/// /etc/zorvagent/agent.toml, else, if that does not exist, the built-in defaults. Throws as readConfig does.
+/// agent.toml of this installation (/etc/zorvagent/agent.toml), else, if that does not exist, the built-in defaults.
+/// Throws as readConfig does.
 ZORVA_AGENT_API Config readDefaultConfig();
 
 }  // namespace zorva::agent

@@ -187,7 +187,12 @@ void addGlobalOptions(CLI::App& app, Globals& globals) {
       ->type_name("N");
   CLI::Option* directory =
       addText(app, "--provider-dir", "Where the provider libraries lie", globals.providerDirectory)->type_name("DIR");
-  addServerOptions(app, globals.servers, {config, directory});
+  CLI::Option* added =
+      addText(app, "--providers",
+              "Further providers: the files .reg and .mof of a directory (default: /etc/zorvagent/providers.d)",
+              globals.addedProviders)
+          ->type_name("DIR");
+  addServerOptions(app, globals.servers, {config, directory, added});
 }
 
 bool takesValue(const CLI::Option& option) { return option.get_items_expected_max() > 0; }

@@ -20,6 +20,7 @@
 #include "cli/session/Session.h"
 #include "cli/session/SettingFile.h"
 #include "cli/session/SettingFiles.h"
+#include "util/InstalledPlaces.h"
 
 namespace zorva::cli {
 
@@ -44,7 +45,7 @@ std::string settingTable(const std::vector<SettingLine>& lines, const Layout& la
 /// A fresh installation has no data directory yet. A missing one with another name is probably misspelt.
 void makeDefaultDirectory() {
   const std::string directory = zorva::agent::dataDirectory();
-  if (directory != zorva::agent::kDefaultDataDir || ::geteuid() != 0) return;
+  if (directory != util::installedPlaces().data || ::geteuid() != 0) return;
   // The user of the server, if there is one, owns it; then the rest of the host reads through the server.
   const passwd* const server = ::getpwnam("zorva");
   if (::mkdir(directory.c_str(), server != nullptr ? 0750 : 0755) == 0) {

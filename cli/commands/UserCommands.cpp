@@ -20,6 +20,7 @@
 #include "cli/output/Table.h"
 #include "cli/output/Terminal.h"
 #include "cli/output/Text.h"
+#include "util/InstalledPlaces.h"
 #include "util/ReadFile.h"
 #include "util/Secret.h"
 #include "util/Text.h"
@@ -32,8 +33,6 @@ namespace {
 
 using access::Users;
 
-constexpr const char* kServerConfig = "/etc/zorvagent/zorvacimd.toml";
-constexpr const char* kDefaultDirectory = "/etc/zorvagent";
 constexpr std::size_t kShortestPassword = 8;
 
 struct UserOptions {
@@ -54,19 +53,19 @@ Failure wrongUsage(const std::string& what, const std::string& hint = {}) { retu
 
 /// Where the server expects its users.
 struct Place {
-  std::string file = access::kDefaultUsersFile;
+  std::string file = access::defaultUsersFile();
   std::string group = access::kDefaultGroup;
 };
 
 /// Reads only what is needed of the server's configuration.
 Place placeOfServer() {
   Place place;
-  const util::FileText config = util::readFile(kServerConfig, std::size_t{256} << 10);
+  const std::string serverConfig = util::installedPlaces().config + "zorvacimd.toml";
+  const util::FileText config = util::readFile(serverConfig, std::size_t{256} << 10);
   if (config.error == ENOENT) return place;
   const std::string hint = "--file names the file of users";
   if (config.error != 0) {
-    throw Failure(ExitCode::Failed,
-                  std::string(kServerConfig) + ": cannot be read: " + util::fileErrorText(config.error), hint);
+    throw Failure(ExitCode::Failed, serverConfig + ": cannot be read: " + util::fileErrorText(config.error), hint);
   }
   try {
     const util::TomlDocument document(config.text);
@@ -74,11 +73,10 @@ Place placeOfServer() {
     table.take("users", place.file);
     table.take("group", place.group);
   } catch (const util::TomlError& error) {
-    throw Failure(ExitCode::Failed,
-                  std::string(kServerConfig) + ":" + std::to_string(error.line()) + ": " + printable(error.what()),
+    throw Failure(ExitCode::Failed, serverConfig + ":" + std::to_string(error.line()) + ": " + printable(error.what()),
                   hint);
   }
-  place.file = util::pathFrom(kServerConfig, place.file);
+  place.file = util::pathFrom(serverConfig, place.file);
   return place;
 }
 
@@ -103,7 +101,7 @@ Users read(const Place& place) {
 
 /// A fresh installation may have no such directory. A missing one with another name is probably misspelt.
 void makeDefaultDirectory(const Place& place) {
-  if (place.file == access::kDefaultUsersFile) ::mkdir(kDefaultDirectory, 0755);
+  if (place.file == access::defaultUsersFile()) ::mkdir(util::installedPlaces().config.c_str(), 0755);
 }
 
 /// Changes the file, which nobody else changes meanwhile.

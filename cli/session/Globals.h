@@ -15,6 +15,7 @@ struct Globals {
   std::string config;             ///< the agent's configuration; empty: as the environment says
   std::optional<int> logLevel;    ///< lines below it are dropped; absent: as the configuration says
   std::string providerDirectory;  ///< empty: beside this program
+  std::string addedProviders;     ///< directory of further providers; empty: the usual one
   bool quiet = false;             ///< write errors only
   bool dryRun = false;            ///< of commands that change: show what would be done, and do nothing
   ServerOptions servers;

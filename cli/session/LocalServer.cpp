@@ -46,7 +46,8 @@ std::optional<Server> serverInstead(const Globals& globals, Need need) {
   if (::geteuid() == 0) return std::nullopt;
   asFailure([&] { zorva::agent::loadConfig(globals.config); });
   if (mayReach(need)) return std::nullopt;
-  const bool isUsualHost = globals.config.empty() && globals.providerDirectory.empty() && !isSet("ZORVAGENT_CONFIG");
+  const bool isUsualHost = globals.config.empty() && globals.providerDirectory.empty() &&
+                           globals.addedProviders.empty() && !isSet("ZORVAGENT_CONFIG");
   const std::string what = std::string("this user may not ") + (need == Need::Read ? "read " : "write to ") +
                            printable(zorva::agent::dataDirectory());
   if ((isUsualHost || isSet("ZORVACTL_SOCKET")) && answers(usualSocket())) {

@@ -14,6 +14,7 @@
 #include "cli/output/Failure.h"
 #include "cli/output/Text.h"
 #include "cli/session/LocalServer.h"
+#include "frontend/AddedProviders.h"
 #include "schema/Schema.h"
 #include "util/LogLevels.h"
 #include "util/Names.h"
@@ -110,7 +111,8 @@ Session::Session(const Globals& globals)
       server_(globals.server),
       logLevel_(globals.logLevel.value_or(util::kLevelError)),
       wantsLog_(globals.logLevel.has_value()),
-      providerDirectory_(globals.providerDirectory) {
+      providerDirectory_(globals.providerDirectory),
+      addedProviders_(globals.addedProviders.empty() ? frontend::usualProviders() : globals.addedProviders) {
   layout_.rowsAlone = globals.isOneOfMany;
   if (isRemote()) return;
   asFailure([&] {
@@ -129,7 +131,9 @@ const std::shared_ptr<const schema::ClassRepository>& Session::classes() {
     static const auto shared = schema::loadBuiltInClasses(schema::ClassSet::Interop);
     classes_ = shared;
   } else {
-    classes_ = schema::loadBuiltInClasses(schema::ClassSet::Profile);
+    const auto classes = schema::loadBuiltInClasses(schema::ClassSet::Profile);
+    asFailure([&] { frontend::addProviders(addedProviders_, registry_, *classes); });
+    classes_ = classes;
   }
   return classes_;
 }
@@ -158,7 +162,9 @@ Operations& Session::cim() {
     return *cim_;
   }
   tree();
+  classes();  // and their providers
   broker::BrokerOptions options;
+  options.registry = registry_;
   options.providerDirectory =
       providerDirectory_.empty() ? broker::ProviderRegistry::builtInDirectory() : providerDirectory_;
   options.claim = claims_.hook();

@@ -94,6 +94,8 @@ class Session {
   bool wantsLog_;
   int quiet_ = 0;  ///< number of living Quiet objects
   std::string providerDirectory_;
+  std::string addedProviders_;
+  broker::ProviderRegistry registry_ = broker::ProviderRegistry::builtIn();
   std::shared_ptr<const schema::ClassRepository> classes_;
   frontend::SettingsClaims claims_;
   std::unique_ptr<Operations> cim_;

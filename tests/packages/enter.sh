@@ -1,0 +1,23 @@
+# enter.sh ROOT COMMAND...: in mount and process namespaces of its own, makes ROOT a small system and runs the command there.
+set -eu
+root=$1
+shift
+mount -t proc proc "$root/proc"
+mount -t tmpfs -o mode=755 tmpfs "$root/run"
+mount -t tmpfs -o mode=755 tmpfs "$root/dev"
+for device in null zero full random urandom tty; do
+  touch "$root/dev/$device"
+  mount --bind "/dev/$device" "$root/dev/$device"
+done
+ln -s /proc/self/fd "$root/dev/fd"
+mkdir "$root/dev/pts" "$root/dev/shm"
+mount -t tmpfs -o mode=1777 tmpfs "$root/dev/shm"
+# In a network of its own: loopback and one interface.
+if [ "${ZORVA_OWN_NETWORK-}" = 1 ]; then
+  ip link set lo up
+  ip link add eth0 type veth peer name eth9
+  ip link set eth0 up
+  ip link set eth9 up
+fi
+exec env -i PATH=/usr/sbin:/usr/bin:/sbin:/bin HOME=/root LC_ALL=C.UTF-8 DEBIAN_FRONTEND=noninteractive \
+  chroot "$root" "$@"
