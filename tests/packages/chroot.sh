@@ -39,6 +39,19 @@ keep_archives() {
   cp -u "$chroot_folder/$1"/var/cache/apt/archives/*.deb "$chroot_folder/archives/"
 }
 
+# boot_root NAME: starts systemd there, which ends with the service zorva-test. It gets a control group of its own.
+boot_root() {
+  local group status
+  group=$(findmnt -no TARGET -t cgroup2 | head -n 1)/zorva-test.$$
+  mkdir "$group" || return
+  ZORVA_BOOT=1 ZORVA_OWN_NETWORK=1 timeout 300 bash -c 'echo $$ >"$1/cgroup.procs" && shift &&
+    exec unshare -m -p -n -u -i -C --fork --kill-child --propagation private bash "$@"' \
+    boot "$group" "$PWD/tests/packages/enter.sh" "$chroot_folder/$1"
+  status=$?
+  find "$group" -depth -type d -exec rmdir {} +
+  return "$status"
+}
+
 # in_root NAME [UNSHARE-OPTIONS...] -- COMMAND...: runs it there. Its mounts and processes end with it.
 in_root() {
   local root=$chroot_folder/$1 options=()

@@ -38,7 +38,7 @@ step_install() {
   others=$(apt-get -s --no-install-recommends install /packages/*.deb | awk '$1 == "Inst" { print $2 }' | grep -v zorva)
   # shellcheck disable=SC2086  # the list is words
   check 'what the packages need can be installed' apt install $others
-  all_files >/before
+  all_files >/packages/before
   check 'the packages can be installed' apt install /packages/*.deb
 }
 
@@ -80,7 +80,7 @@ step_serve() {
   local server
   install -d -o zorva -g zorva /run/zorvacimd
   check 'the installed configuration of the server is good' as zorva zorvacimd --check-config
-  as zorva zorvacimd >/tmp/server.log 2>&1 &
+  setpriv --reuid zorva --regid zorva --init-groups zorvacimd >/tmp/server.log 2>&1 &
   server=$!
   for _ in $(seq 50); do
     [ ! -S /run/zorvacimd/cim.sock ] || break
@@ -92,7 +92,7 @@ step_serve() {
   check 'no other user can change it' says ACCESS_DENIED as nobody zorvactl --url unix: dns set eth0 192.0.2.2
   kill "$server"
   wait "$server"
-  check 'it ends well' is $? 0
+  check 'it ends well' is "$?" 0
 }
 
 step_upgrade() {
@@ -118,10 +118,44 @@ step_remove() {
   check 'the configuration is left' grep -q '^port = 5999' /etc/zorvagent/zorvacimd.toml
   check 'the data is left' test -f /var/lib/zorvagent/ifcfg-eth0
   # shellcheck disable=SC2086
-  check 'the packages can be purged' apt purge $ours
-  all_files >/after
-  check 'the purge leaves no file' diff /before /after
+  check 'the packages can be purged' quietly dpkg --purge $ours
+  all_files >/packages/after
+  check 'the purge leaves no file' diff /packages/before /packages/after
 }
+
+active() { is "$(systemctl is-active "$@" | sort -u)" active; }
+
+# As a service of systemd.
+step_boot() {
+  check 'the packages can be installed where systemd runs' apt install /packages/*.deb
+  check 'the server runs' active zorvacimd.service zorvacimd.socket
+  check 'changes are waited for' active zorva-apply.path
+  check 'any user sees the host' as nobody zorvactl --quiet show
+  check 'any user is answered by the server' says eth0 as nobody zorvactl --url unix: show
+  check 'root can make a settings file' zorvactl --quiet ifcfg init eth0
+  useradd -G zorva someone
+  check 'a member of the group can change it through the server' as someone zorvactl --url unix: --quiet dns set eth0 192.0.2.7
+  check 'the change reaches the host' grep -q 192.0.2.7 /etc/resolv.conf
+  check 'the service of root did that' differ "$(systemctl show -p ExecMainPID zorva-apply.service)" ExecMainPID=0
+  check 'the data directory still belongs to the user of the server' stat_is /var/lib/zorvagent 'zorva:zorva 750'
+  check 'a second change works' as someone zorvactl --url unix: --quiet dns set eth0 192.0.2.8
+  local socket
+  socket=$(systemctl show -p ActiveEnterTimestampMonotonic zorvacimd.socket)
+  server=$(systemctl show -p MainPID zorvacimd.service)
+  check 'the next version can be installed' apt install /packages/next/*.deb
+  check 'the sockets stayed open' is "$(systemctl show -p ActiveEnterTimestampMonotonic zorvacimd.socket)" "$socket"
+  check 'the server was started again' active zorvacimd.service
+  check 'it is another process' differ "$(systemctl show -p MainPID zorvacimd.service)" "$server"
+  check 'the data is kept' grep -q 192.0.2.8 /var/lib/zorvagent/ifcfg-eth0
+  # shellcheck disable=SC2086
+  check 'the packages can be removed' apt remove $ours
+  check 'nothing of them runs' is "$(systemctl list-units --no-legend --state=active 'zorva*' | grep -v zorva-test)" ''
+  # shellcheck disable=SC2086
+  check 'and purged' quietly dpkg --purge $ours
+  echo 'all of it was run'
+}
+
+differ() { [ "$1" != "$2" ]; }
 
 # For developers: with the compiler, after everything else.
 step_develop() {
