@@ -72,7 +72,8 @@ std::string classesText() {
 std::vector<Placed> sfcbFiles(const std::string& staging) {
   std::vector<Placed> files;
   for (const std::string& nameSpace : nameSpacesOf(ProviderRegistry::builtIn())) {
-    files.push_back({Placed::Kind::File, staging + "/mofs/" + nameSpace + "/zorva.mof", classesText()});
+    files.push_back(
+        {Placed::Kind::File, (fs::path(staging) / "mofs" / nameSpace / "zorva.mof").string(), classesText()});
   }
   files.push_back({Placed::Kind::File, staging + "/regs/zorva.reg", sfcbText()});
   return files;
@@ -103,10 +104,13 @@ std::vector<std::string> pegasusSteps(const RegisterOptions& options) {
     return steps;
   }
   const std::string compile = options.repository.empty() ? "cimmof" : "cimmofl -R" + shellWord(options.repository);
+  const auto compileInto = [&](const std::string& nameSpace, const char* file) {
+    return compile + " -n" + nameSpace + " " + shellWord(options.staging + "/" + file);
+  };
   for (const std::string& nameSpace : nameSpacesOf(ProviderRegistry::builtIn())) {
-    steps.push_back(compile + " -n" + nameSpace + " " + shellWord(options.staging + "/zorva.mof"));
+    steps.push_back(compileInto(nameSpace, "zorva.mof"));
   }
-  steps.push_back(compile + " -nroot/PG_InterOp " + shellWord(options.staging + "/zorva-pegasus.mof"));
+  steps.push_back(compileInto("root/PG_InterOp", "zorva-pegasus.mof"));
   if (!options.repository.empty()) steps.emplace_back("systemctl restart tog-pegasus");
   return steps;
 }
@@ -143,7 +147,8 @@ std::vector<Placed> linksIn(const std::string& directory, const Globals& globals
   std::vector<Placed> links;
   for (const std::string& library : librariesOf(ProviderRegistry::builtIn())) {
     const std::string file = "lib" + library + ".so";
-    links.push_back({Placed::Kind::Link, directory + "/" + file, (fs::path(libraries) / (file + ".1")).string()});
+    links.push_back(
+        {Placed::Kind::Link, (fs::path(directory) / file).string(), (fs::path(libraries) / (file + ".1")).string()});
   }
   return links;
 }
@@ -177,7 +182,7 @@ bool isInPath(const std::string& program) {
   const char* const path = std::getenv("PATH");
   std::istringstream directories(path == nullptr ? "" : path);
   for (std::string directory; std::getline(directories, directory, ':');) {
-    if (!directory.empty() && ::access((directory + "/" + program).c_str(), X_OK) == 0) return true;
+    if (!directory.empty() && ::access((fs::path(directory) / program).c_str(), X_OK) == 0) return true;
   }
   return false;
 }
