@@ -29,6 +29,8 @@ struct LoginOptions {
   Role anonymous = Role::Read;        ///< of clients without a login, on loopback addresses
   std::string group = kDefaultGroup;  ///< its members operate over the Unix socket
   Role otherLocal = Role::Read;       ///< of all other local users there
+
+  bool operator==(const LoginOptions&) const = default;
 };
 
 /// What the gate needs of its surroundings.

@@ -70,6 +70,25 @@ function(zorva_limit_exports target file)
   target_compile_options(${target} PRIVATE $<$<CXX_COMPILER_ID:GNU>:-fno-gnu-unique>)
 endfunction()
 
+# zorva_add_manual(PROGRAM WORD): once it is built, PROGRAM writes its manual and what else is made of its texts into
+# manual/PROGRAM of the build folder, as "PROGRAM WORD FOLDER". Its pages are installed.
+function(zorva_add_manual program word)
+  set(launcher)
+  if(ZORVA_SANITIZE STREQUAL "thread")
+    # ThreadSanitizer cannot map its shadow memory if the kernel randomizes addresses too widely.
+    set(launcher setarch -R)
+  endif()
+  set(folder ${CMAKE_BINARY_DIR}/manual/${program})
+  add_custom_command(OUTPUT ${folder}/done
+    COMMAND ${CMAKE_COMMAND} -E rm -rf ${folder}
+    COMMAND ${launcher} $<TARGET_FILE:${program}> ${word} ${folder}
+    COMMAND ${CMAKE_COMMAND} -E touch ${folder}/done
+    DEPENDS ${program} VERBATIM)
+  add_custom_target(${program}_manual ALL DEPENDS ${folder}/done)
+  install(DIRECTORY ${folder}/ DESTINATION ${CMAKE_INSTALL_MANDIR}
+    FILES_MATCHING PATTERN "*.1" PATTERN "*.5" PATTERN "*.8" PATTERN "completion" EXCLUDE)
+endfunction()
+
 # Headers that many sources include are compiled once for all of them. A build without tests does without, so it shows
 # whether each source includes all that it uses.
 option(ZORVA_PRECOMPILE "Precompile the standard library's and GoogleTest's headers" ${ZORVA_BUILD_TESTS})

@@ -22,6 +22,8 @@ struct HttpLimits {
   std::chrono::milliseconds drain{10'000};     ///< for running requests when the server ends
 
   bool gzip = true;  ///< responses are compressed for clients that accept it
+
+  bool operator==(const HttpLimits&) const = default;
 };
 
 }  // namespace zorva::http

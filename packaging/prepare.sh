@@ -5,7 +5,8 @@
 build_packages=(g++ cmake ninja-build pkg-config python3-minimal libspdlog-dev libfmt-dev nlohmann-json3-dev
   libtomlplusplus-dev libutfcpp-dev libcli11-dev libmnl-dev libsystemd-dev libmicrohttpd-dev libgnutls28-dev libcrypt-dev
   zlib1g-dev libpugixml-dev libcurl4-openssl-dev libexpected-dev)
-test_packages=(python3 python3-jsonschema jq git libgtest-dev libgmock-dev binutils iproute2 libxml2-utils sblim-wbemcli curl openssl clang)
+test_packages=(python3 python3-jsonschema jq git libgtest-dev libgmock-dev binutils iproute2 libxml2-utils sblim-wbemcli curl openssl clang
+  groff-base zsh fish)
 clang_packages=(clang clang-tidy)
 deb_packages=(debhelper dpkg-dev)
 deb_test_packages=(debootstrap iproute2 lintian)

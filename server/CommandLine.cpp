@@ -4,22 +4,26 @@
 #include <filesystem>
 
 #include "http/Listener.h"
+#include "manual/AppTree.h"
+#include "server/Manual.h"
 
 namespace zorva::server {
 
 namespace {
 
-constexpr const char* kExamples = R"(
-Examples:
-  zorvacimd                                     serve as /etc/zorvagent/zorvacimd.toml says
+constexpr const char* kExamples =
+    R"(  zorvacimd                                     serve as /etc/zorvagent/zorvacimd.toml says
   zorvacimd --port 0                            on a port that is free, and print it
   zorvacimd --listen ::1 --log-level 4500       on one address, with a log line for each request
   zorvacimd --anonymous operate                 every user of this host may change settings
   zorvacimd --config my.toml --check-config     is that configuration good?
-  zorvacimd --make-certificate                  a certificate for HTTPS, where there is none
+  zorvacimd --make-certificate                  a certificate for HTTPS, where there is none)";
+
+constexpr const char* kClosing = R"(
 
 Plain HTTP is for this host only; other hosts use HTTPS ([tls] in the configuration). SIGHUP reads the configuration
-and the certificate again, SIGTERM ends it when the requests in work are done. Exit status: 0 ended as it was told to, 1 it cannot serve, 2 wrong usage or configuration.)";
+and the certificate again, SIGTERM ends it when the requests in work are done. Exit status: 0 ended as it was told to, 1 it cannot serve, 2 wrong usage or configuration.
+man zorvacimd tells more, and man zorvacimd.toml explains every key.)";
 
 void addOptions(CLI::App& app, CommandLine& line) {
   app.add_option("--config", line.configFile, "The configuration (default: /etc/zorvagent/zorvacimd.toml)")
@@ -49,6 +53,17 @@ void addOptions(CLI::App& app, CommandLine& line) {
   app.add_flag("--make-certificate", line.makeCertificate,
                "Write a self-signed certificate for HTTPS and its key, print its fingerprint, and end");
   app.add_flag("--greet", line.greet, "Print how to ask this server something, as on a terminal");
+  // For the build only.
+  app.add_option("--manual", line.manualDirectory, "")->group("");
+}
+
+Telling tellManual(const CLI::App& app, const std::string& directory) try {
+  manual::Command program = manual::commandOf(app);
+  program.examples = kExamples;
+  writeManual(directory, program);
+  return {};
+} catch (const std::runtime_error& error) {
+  return {error.what(), true};
 }
 
 std::string absolute(const std::string& path) { return path.empty() ? path : std::filesystem::absolute(path).string(); }
@@ -60,7 +75,7 @@ std::variant<CommandLine, Telling> readCommandLine(int argc, const char* const* 
   CLI::App app("A CIM server: CIM-XML over HTTP (DSP0200, DSP0201) for the DNS client configuration of this host.",
                "zorvacimd");
   app.set_version_flag("--version", std::string("zorvacimd ") + ZORVA_VERSION);
-  app.footer(kExamples);
+  app.footer(std::string("\nExamples:\n") + kExamples + kClosing);
   addOptions(app, line);
   try {
     app.parse(argc, argv);
@@ -71,7 +86,8 @@ std::variant<CommandLine, Telling> readCommandLine(int argc, const char* const* 
   } catch (const CLI::ParseError& error) {
     return Telling{std::string(error.what()) + "\nzorvacimd --help shows the usage", true};
   }
-  return line;
+  return line.manualDirectory.empty() ? std::variant<CommandLine, Telling>(line)
+                                      : tellManual(app, line.manualDirectory);
 }
 
 Config configOf(const CommandLine& line) {

@@ -22,6 +22,7 @@ struct CommandLine {
   bool checkConfig = false;      ///< read the configuration, report whether it is valid, and end
   bool makeCertificate = false;  ///< write a self-signed certificate, and end
   bool greet = false;            ///< print on standard output how to send this server a request
+  std::string manualDirectory;   ///< write the manual there, and end; empty: serve
 };
 
 /// A text to print instead of serving.

@@ -14,6 +14,7 @@
 #include "http/Listener.h"
 #include "http/TlsIdentity.h"
 #include "util/LogLevels.h"
+#include "util/TomlKeys.h"
 
 namespace zorva::server {
 
@@ -63,7 +64,12 @@ struct Config {
   /// [log]
   int logLevel = util::kLevelWarning;    ///< lines below it are dropped
   std::optional<std::string> logTarget;  ///< absent: the agent's default
+
+  bool operator==(const Config&) const = default;
 };
+
+/// The tables and keys of the file.
+util::TomlSections configKeys();
 
 /// Reads and checks a configuration. Relative paths start at the directory of the file. Throws
 /// zorva::agent::ConfigError, which names file, line and key, for every error, also for a file that cannot be read.

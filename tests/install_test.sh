@@ -17,13 +17,21 @@ unset ZORVAGENT_CONFIG
 
 # What is commented in the configuration can be used as it stands.
 grep -q '^apply = "host"' "$prefix/etc/zorvagent/agent.toml"
-sed -E 's/^# ([a-z_]+ = )/\1/' "$prefix/etc/zorvagent/agent.toml" >"$work/all.toml"
+sed -E '/^[a-z_]+ = /d; s/^#([a-z_]+ = )/\1/' "$prefix/etc/zorvagent/agent.toml" >"$work/all.toml"
 "$prefix/bin/zorvactl" --config "$work/all.toml" tree >/dev/null
 
 # The programs find the libraries beside them, and the configuration of their prefix.
 "$prefix/sbin/zorvacimd" --check-config | grep -qx "$prefix/etc/zorvagent/zorvacimd.toml: good"
 printf '[agent]\nsystem_name = "installed-here"\n' >"$prefix/etc/zorvagent/agent.toml"
 "$prefix/bin/zorvactl" enumerate ZORVA_ComputerSystem --output json | grep -q installed-here
+
+# Every command has its page, and the shells find their completion.
+for page in man1/zorvactl.1 man1/zorvactl-show.1 man5/agent.toml.5 man5/zorvacimd.toml.5 man8/zorvacimd.8; do
+  test -s "$prefix/share/man/$page"
+done
+for script in bash-completion/completions/zorvactl zsh/site-functions/_zorvactl fish/vendor_completions.d/zorvactl.fish; do
+  test -s "$prefix/share/$script"
+done
 "$prefix/bin/zorvactl" names ZORVA_DNSGeneralSettingData >/dev/null
 if "$prefix/bin/zorvactl" ifcfg remove none 2>"$work/error"; then die 'a file was removed that does not exist'; fi
 grep -q "$prefix/var/lib/zorvagent" "$work/error" || die "another data directory: $(cat "$work/error")"

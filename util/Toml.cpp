@@ -1,8 +1,8 @@
 #include "util/Toml.h"
 
 #include <algorithm>
+#include <cstdint>
 #include <filesystem>
-#include <limits>
 #include <utility>
 
 #include "util/Nearest.h"
@@ -22,10 +22,35 @@ std::string suggestion(std::string_view word, const std::vector<std::string>& kn
   return question.empty() ? question : "; " + question;
 }
 
+const TomlSection* sectionNamed(TomlSections sections, std::string_view name) {
+  const auto found =
+      std::find_if(sections.begin(), sections.end(), [&](const auto& each) { return each.name == name; });
+  return found == sections.end() ? nullptr : &*found;
+}
+
+/// The words of a key as an error lists them: "read", "operate" or "none".
+std::string alternatives(std::string_view words) {
+  std::string text;
+  for (std::size_t from = 0; from <= words.size();) {
+    const std::size_t end = std::min(words.find('|', from), words.size());
+    const bool isLast = end == words.size();
+    if (from > 0) text += isLast ? " or " : ", ";
+    text.append(1, '"').append(words.substr(from, end - from)).append(1, '"');
+    from = end + 1;
+  }
+  return text;
+}
+
+bool isAmong(std::string_view words, std::string_view word) {
+  const std::string all = "|" + std::string(words) + "|";
+  return word.find('|') == std::string_view::npos && all.find("|" + std::string(word) + "|") != std::string::npos;
+}
+
 }  // namespace
 
 struct TomlDocument::Parsed {
   toml::table table;
+  TomlSections sections = {};
 };
 
 TomlDocument::TomlDocument(const std::string& text) {
@@ -34,15 +59,18 @@ TomlDocument::TomlDocument(const std::string& text) {
   parsed_ = std::make_unique<Parsed>(Parsed{std::move(result).table()});
 }
 
-TomlDocument::~TomlDocument() = default;
-
-void TomlDocument::refuseAllBut(std::initializer_list<std::string_view> names) const {
+TomlDocument::TomlDocument(const std::string& text, TomlSections sections) : TomlDocument(text) {
+  parsed_->sections = sections;
   for (const auto& [key, node] : parsed_->table) {
-    if (std::find(names.begin(), names.end(), key.str()) != names.end()) continue;
+    if (sectionNamed(sections, key.str()) != nullptr) continue;
+    std::vector<std::string> names;
+    for (const TomlSection& section : sections) names.emplace_back(section.name);
     throw TomlError(lineOf(key.source()), std::string(key.str()),
-                    "is not a known table or key" + suggestion(key.str(), {names.begin(), names.end()}));
+                    "is not a known table or key" + suggestion(key.str(), names));
   }
 }
+
+TomlDocument::~TomlDocument() = default;
 
 struct TomlTable::Table {
   const toml::table& keys;
@@ -52,7 +80,8 @@ struct TomlTable::Node {
   const toml::node* node;
 };
 
-TomlTable::TomlTable(const TomlDocument& document, std::string name) : name_(std::move(name)) {
+TomlTable::TomlTable(const TomlDocument& document, std::string name)
+    : name_(std::move(name)), sections_(document.parsed_->sections) {
   const toml::node* node = document.parsed_->table.get(name_);
   if (node == nullptr) return;
   if (!node->is_table()) throw TomlError(lineOf(node->source()), name_, "expected a table");
@@ -77,29 +106,25 @@ void TomlTable::take(const char* key, bool& value) {
 }
 
 void TomlTable::take(const char* key, int& value) {
-  const Node found = find(key);
-  if (found.node == nullptr) return;
-  const std::int64_t number = numberOf(found, key, "expected a whole number");
-  if (number < std::numeric_limits<int>::min() || number > std::numeric_limits<int>::max()) {
-    fail(key, "is out of range");
-  }
+  const toml::node* node = find(key).node;
+  if (node == nullptr) return;
+  const TomlKey& known = keyNamed(key);
+  const bool isAny = known.least == TomlKey().least && known.most == TomlKey().most;
+  const std::string range = " from " + std::to_string(known.least) + " to " + std::to_string(known.most);
+  if (!node->is_integer()) fail(key, "expected a whole number" + (isAny ? std::string() : range));
+  const std::int64_t number = node->ref<std::int64_t>();
+  if (number < known.least || number > known.most) fail(key, isAny ? "is out of range" : "must be" + range);
   value = static_cast<int>(number);
 }
 
-void TomlTable::take(const char* key, int& value, int least, int most) {
-  const Node found = find(key);
-  if (found.node == nullptr) return;
-  const std::string range = "from " + std::to_string(least) + " to " + std::to_string(most);
-  const std::int64_t number = numberOf(found, key, "expected a whole number " + range);
-  if (number < least || number > most) fail(key, "must be " + range);
-  value = static_cast<int>(number);
-}
-
-void TomlTable::take(const char* key, std::optional<std::vector<std::string>>& value, const char* expected) {
+void TomlTable::take(const char* key, std::optional<std::vector<std::string>>& value) {
   const toml::node* node = find(key).node;
   if (node == nullptr) return;
   const toml::array* array = node->as_array();
-  if (array == nullptr || array->empty()) fail(key, expected);
+  if (array == nullptr || array->empty()) {
+    const std::string example(keyNamed(key).example);
+    fail(key, "expected a list of texts" + (example.empty() ? example : " such as " + example));
+  }
   value.emplace();
   for (const toml::node& element : *array) value->push_back(textOf({&element}, key));
 }
@@ -119,20 +144,29 @@ void TomlTable::fail(const char* key, const std::string& problem) const {
 }
 
 TomlTable::Node TomlTable::find(const char* key) {
+  keyNamed(key);
   known_.emplace_back(key);
   return {table_ == nullptr ? nullptr : table_->keys.get(key)};
+}
+
+const TomlKey& TomlTable::keyNamed(std::string_view key) const {
+  static constexpr TomlKey kAny;
+  if (sections_.empty()) return kAny;
+  if (const TomlSection* section = sectionNamed(sections_, name_); section != nullptr) {
+    for (const TomlKey& each : section->keys) {
+      if (each.name == key) return each;
+    }
+  }
+  throw std::logic_error("no key is declared as " + name_ + '.' + std::string(key));
 }
 
 std::string TomlTable::textOf(Node node, const char* key) const {
   if (!node.node->is_string()) fail(key, "expected a text in quotes");
   const std::string& text = node.node->ref<std::string>();
   if (text.find('\0') != std::string::npos) fail(key, "must not hold a NUL");
+  const std::string_view words = keyNamed(key).words;
+  if (!words.empty() && !isAmong(words, text)) fail(key, "must be " + alternatives(words));
   return text;
-}
-
-std::int64_t TomlTable::numberOf(Node node, const char* key, const std::string& expected) const {
-  if (!node.node->is_integer()) fail(key, expected);
-  return node.node->ref<std::int64_t>();
 }
 
 std::string pathFrom(const std::string& file, const std::string& path) {

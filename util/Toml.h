@@ -2,9 +2,6 @@
 
 // Reads configurations in TOML 1.0. Every key is checked, and an error names its place.
 
-#include <climits>
-#include <cstdint>
-#include <initializer_list>
 #include <memory>
 #include <optional>
 #include <stdexcept>
@@ -13,6 +10,7 @@
 #include <vector>
 
 #include "util/NotCopied.h"
+#include "util/TomlKeys.h"
 
 namespace zorva::util {
 
@@ -32,12 +30,14 @@ class TomlError : public std::runtime_error {
 
 class TomlDocument : util::NotCopied {
  public:
-  /// Throws TomlError for text that is no TOML.
+  /// Any key may be taken from it. Throws TomlError for text that is no TOML.
   explicit TomlDocument(const std::string& text);
-  ~TomlDocument();
 
-  /// Throws TomlError for anything at the top but tables and keys of these names; it suggests the nearest of them.
-  void refuseAllBut(std::initializer_list<std::string_view> names) const;
+  /// A document of these tables and keys alone. Throws TomlError for text that is no TOML, and for anything else at the
+  /// top.
+  TomlDocument(const std::string& text, TomlSections sections);
+
+  ~TomlDocument();
 
  private:
   friend class TomlTable;
@@ -46,7 +46,8 @@ class TomlDocument : util::NotCopied {
 };
 
 /// One table of a document, which must outlive it. A function that takes a value leaves the variable unchanged if the
-/// table, or the key in it, does not exist. All throw TomlError.
+/// table, or the key in it, does not exist. A value must be among the words and within the range of its key. All throw
+/// TomlError, and std::logic_error for a key that the document's tables do not have.
 class TomlTable : util::NotCopied {
  public:
   TomlTable(const TomlDocument& document, std::string name);
@@ -56,10 +57,9 @@ class TomlTable : util::NotCopied {
   void take(const char* key, std::optional<std::string>& value);
   void take(const char* key, bool& value);
   void take(const char* key, int& value);
-  void take(const char* key, int& value, int least, int most);
 
-  /// A list of texts that is not empty; `expected` describes it in the error.
-  void take(const char* key, std::optional<std::vector<std::string>>& value, const char* expected);
+  /// A list of texts that is not empty.
+  void take(const char* key, std::optional<std::vector<std::string>>& value);
 
   /// Refuses the keys that were not taken, and suggests the nearest of those that were.
   void finish() const;
@@ -69,10 +69,11 @@ class TomlTable : util::NotCopied {
  private:
   struct Node;
   Node find(const char* key);
+  const TomlKey& keyNamed(std::string_view key) const;
   std::string textOf(Node node, const char* key) const;
-  std::int64_t numberOf(Node node, const char* key, const std::string& expected) const;
 
   const std::string name_;
+  const TomlSections sections_;
   struct Table;
   std::unique_ptr<Table> table_;  ///< null if the document has none of that name
   std::vector<std::string_view> known_;

@@ -17,9 +17,19 @@ std::string problem(const std::function<void()>& read) {
   return {};
 }
 
+constexpr TomlKey kKeys[] = {
+    {.name = "name"},
+    {.name = "flag", .type = TomlType::Switch},
+    {.name = "number", .type = TomlType::Number},
+    {.name = "small", .type = TomlType::Number, .least = 1, .most = 9},
+    {.name = "list", .type = TomlType::Texts, .example = "['a']"},
+    {.name = "word", .words = "one|two|three"},
+};
+constexpr TomlSection kSections[] = {{.name = "t", .keys = kKeys}};
+
 std::string problemOf(const std::string& text, const std::function<void(TomlTable&)>& read) {
   return problem([&] {
-    const TomlDocument document(text);
+    const TomlDocument document(text, kSections);
     TomlTable table(document, "t");
     read(table);
     table.finish();
@@ -35,14 +45,14 @@ struct Values {
 };
 
 Values valuesOf(const std::string& text) {
-  const TomlDocument document(text);
+  const TomlDocument document(text, kSections);
   TomlTable table(document, "t");
   Values values;
   table.take("name", values.name);
   table.take("flag", values.flag);
   table.take("number", values.number);
-  table.take("small", values.small, 0, 1);
-  table.take("list", values.list, "expected a list");
+  table.take("small", values.small);
+  table.take("list", values.list);
   table.finish();
   return values;
 }
@@ -67,43 +77,44 @@ TEST(Toml, ValuesAreTaken) {
   EXPECT_EQ(values.list, (std::vector<std::string>{"x", "y"}));
 }
 
+/// The error of a document with this key of this value, which is taken as the variable's type.
+template <typename Value>
+std::string problemOfValue(const char* key, const std::string& value) {
+  return problemOf("[t]\n" + std::string(key) + " = " + value + "\n", [key](TomlTable& table) {
+    Value taken{};
+    table.take(key, taken);
+  });
+}
+
 TEST(Toml, AValueOfAnotherTypeIsRefusedWithLineAndKey) {
-  const auto text = [](TomlTable& table) {
-    std::string value;
-    table.take("k", value);
-  };
-  const auto number = [](TomlTable& table) {
-    int value = 0;
-    table.take("k", value);
-  };
-  const auto ranged = [](TomlTable& table) {
-    int value = 0;
-    table.take("k", value, 1, 9);
-  };
-  const auto flag = [](TomlTable& table) {
-    bool value = false;
-    table.take("k", value);
-  };
-  const auto list = [](TomlTable& table) {
-    std::optional<std::vector<std::string>> value;
-    table.take("k", value, "expected a list of names");
-  };
-  EXPECT_EQ(problemOf("[t]\n\nk = 1\n", text), "3 t.k: expected a text in quotes");
-  EXPECT_EQ(problemOf("[t]\nk = \"a\\u0000b\"\n", text), "2 t.k: must not hold a NUL");
-  EXPECT_EQ(problemOf("[t]\nk = 'a'\n", number), "2 t.k: expected a whole number");
-  EXPECT_EQ(problemOf("[t]\nk = 2147483648\n", number), "2 t.k: is out of range");
-  EXPECT_EQ(problemOf("[t]\nk = 1.5\n", ranged), "2 t.k: expected a whole number from 1 to 9");
-  EXPECT_EQ(problemOf("[t]\nk = 10\n", ranged), "2 t.k: must be from 1 to 9");
-  EXPECT_EQ(problemOf("[t]\nk = 1\n", flag), "2 t.k: expected true or false");
-  EXPECT_EQ(problemOf("[t]\nk = []\n", list), "2 t.k: expected a list of names");
-  EXPECT_EQ(problemOf("[t]\nk = [1]\n", list), "2 t.k: expected a text in quotes");
+  using List = std::optional<std::vector<std::string>>;
+  EXPECT_EQ(problemOfValue<std::string>("name", "1"), "2 t.name: expected a text in quotes");
+  EXPECT_EQ(problemOfValue<std::string>("name", "\"a\\u0000b\""), "2 t.name: must not hold a NUL");
+  EXPECT_EQ(problemOfValue<int>("number", "'a'"), "2 t.number: expected a whole number");
+  EXPECT_EQ(problemOfValue<int>("number", "2147483648"), "2 t.number: is out of range");
+  EXPECT_EQ(problemOfValue<int>("small", "1.5"), "2 t.small: expected a whole number from 1 to 9");
+  EXPECT_EQ(problemOfValue<int>("small", "10"), "2 t.small: must be from 1 to 9");
+  EXPECT_EQ(problemOfValue<bool>("flag", "1"), "2 t.flag: expected true or false");
+  EXPECT_EQ(problemOfValue<List>("list", "[]"), "2 t.list: expected a list of texts such as ['a']");
+  EXPECT_EQ(problemOfValue<List>("list", "[1]"), "2 t.list: expected a text in quotes");
+}
+
+TEST(Toml, AWordMustBeOneOfItsKey) {
+  EXPECT_EQ(problemOfValue<std::string>("word", "'two'"), "");
+  for (const char* word : {"'four'", "''", "'one|two'", "'tw'"}) {
+    EXPECT_EQ(problemOfValue<std::string>("word", word), "2 t.word: must be \"one\", \"two\" or \"three\"") << word;
+  }
 }
 
 TEST(Toml, UnknownKeysAreRefused) {
   EXPECT_EQ(problemOf("[t]\nk = 1\n", [](TomlTable&) {}), "2 t.k: is not a known key");
   EXPECT_EQ(problemOf("t = 1\n", [](TomlTable&) {}), "1 t: expected a table");
-  EXPECT_EQ(problem([] { TomlDocument("[a]\n[b]\n").refuseAllBut({"a"}); }), "2 b: is not a known table or key");
-  EXPECT_EQ(problem([] { TomlDocument("[a]\n").refuseAllBut({"a"}); }), "");
+  EXPECT_EQ(problem([] { TomlDocument("[t]\n[b]\n", kSections); }), "2 b: is not a known table or key");
+  EXPECT_EQ(problem([] { TomlDocument("[b]\n"); }), "");
+}
+
+TEST(Toml, AKeyThatIsNotDeclaredCannotBeTaken) {
+  EXPECT_THROW(problemOfValue<std::string>("undeclared", "'a'"), std::logic_error);
 }
 
 TEST(Toml, TextThatIsNoTomlIsRefusedWithItsLine) {

@@ -8,6 +8,7 @@
 #include "agent/interface/AgentApi.h"
 #include "util/InstalledPlaces.h"
 #include "util/LogLevels.h"
+#include "util/TomlKeys.h"
 
 namespace zorva::agent {
 
@@ -35,12 +36,14 @@ class ZORVA_AGENT_API ConfigError : public std::runtime_error {
 /// [bmc]: the service processor that zorva-bmc asks.
 struct BmcConfig {
   std::string url;           ///< "https://HOST[:PORT]"; empty: the one that the firmware names
-  std::string user;          ///< empty: an account that the service processor makes for this host
+  std::string user;          ///< of the login; empty only together with the next
   std::string passwordFile;  ///< whose first line is the password
   std::string caFile;        ///< with the authorities that its certificate is checked against; empty: the system's
   std::string fingerprint;   ///< SHA-256 of its certificate: 64 lower-case hexadecimal digits; empty: not compared
   int interval = 60;         ///< seconds from one reading to the next
   std::string file;          ///< what was read; empty: no service processor is in the tree
+
+  bool operator==(const BmcConfig&) const = default;
 };
 
 /// The default place of what zorva-bmc read.
@@ -68,7 +71,12 @@ struct Config {
   std::string traceTarget = "off";
 
   BmcConfig bmc;
+
+  bool operator==(const Config&) const = default;
 };
+
+/// The tables and keys of the file.
+ZORVA_AGENT_API util::TomlSections configKeys();
 
 /// Reads and checks a configuration (TOML 1.0). Throws ConfigError for whatever is wrong with it, a file that cannot be
 /// read included. Thread-safe.

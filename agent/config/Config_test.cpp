@@ -79,6 +79,28 @@ trace_target = "/var/log/agent.trace"
   EXPECT_EQ(config.traceTarget, "/var/log/agent.trace");
 }
 
+TEST_F(ConfigTest, TheDefaultsThatAreDeclaredAreTheDefaults) {
+  std::string text;
+  for (const util::TomlSection& section : configKeys()) {
+    text.append("[").append(section.name).append("]\n");
+    for (const util::TomlKey& key : section.keys) text.append(key.name).append(" = ").append(key.standard).append("\n");
+  }
+  EXPECT_EQ(read(text), read(""));
+}
+
+TEST_F(ConfigTest, EachKeyThatIsDeclaredIsReadAndMatters) {
+  for (const util::TomlSection& section : configKeys()) {
+    for (const util::TomlKey& key : section.keys) {
+      std::string text("[" + std::string(section.name) + "]\n" + std::string(key.name) + " = ");
+      text.append(key.example).append("\n");
+      if (key.name == "source") text += "file = \"tree.json\"\n";
+      if (key.name == "url" || key.name == "password_file") text += "user = \"operator\"\n";
+      if (key.name == "url" || key.name == "user") text += "password_file = \"bmc.password\"\n";
+      EXPECT_NE(read(text), read("")) << text;
+    }
+  }
+}
+
 TEST_F(ConfigTest, PathsAreTakenFromTheDirectoryOfTheFile) {
   const Config config = read("agent.data_dir = \"data/\"\ntree.file = \"tree.json\"\nlog.target = \"log\"\n");
   EXPECT_EQ(config.dataDir, directory_ / "data/");
@@ -110,9 +132,9 @@ TEST_F(ConfigTest, AWrongTypeIsNamedWithItsLine) {
 
 TEST_F(ConfigTest, AWrongValueIsNamedWithItsLine) {
   const Cases cases = {
-      {"[tree]\nsource = \"hots\"\n", "agent.toml:2: tree.source: expected \"host\" or \"file\""},
+      {"[tree]\nsource = \"hots\"\n", "agent.toml:2: tree.source: must be \"host\" or \"file\""},
       {"[tree]\nsource = \"file\"\n", "agent.toml:2: tree.source: \"file\" needs tree.file as well"},
-      {"[tree]\napply = \"both\"\n", "agent.toml:2: tree.apply: expected \"overlay\" or \"host\""},
+      {"[tree]\napply = \"both\"\n", "agent.toml:2: tree.apply: must be \"overlay\" or \"host\""},
       {"[agent]\ndata_dir = \"\"\n", "agent.toml:2: agent.data_dir: must not be empty"},
       {"[agent]\ndata_dir = \"a\\u0000b\"\n", "agent.toml:2: agent.data_dir: must not hold a NUL"},
       {"[agent]\nsystem_name = \"a\\nb\"\n", "agent.toml:2: agent.system_name: must not hold control characters"},

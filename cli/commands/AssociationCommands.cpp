@@ -177,14 +177,16 @@ void addAssociationCommands(CommandLine& line) {
       .examples(
           "  zorvactl ai 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' --result-class CIM_RemoteServiceAccessPoint\n"
           "  zorvactl ai 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' --assoc-class ZORVA_DNSEndPointElementSettingData");
-  addOne(line, {"associator-names", "ain", "Their names"}, Results::Names, addFarEnd, showAssociatorNames)
+  addOne(line, {"associator-names", "ain", "The names of the objects that an object is associated with"},
+         Results::Names, addFarEnd, showAssociatorNames)
       .examples(
           "  zorvactl ain 'ZORVA_DNSSettingData.InstanceID=\"Computer%eth0\"'\n"
           "  zorvactl ain 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' --role Dependent --result-role Antecedent");
   addOne(line, {"references", "ri", "The associations of an object"}, Results::Instances, addAssociation,
          showReferences)
       .examples("  zorvactl ri 'ZORVA_RemoteServiceAccessPoint.Name=\"192.0.2.53\"'");
-  addOne(line, {"reference-names", "rin", "Their names"}, Results::Names, addAssociation, showReferenceNames)
+  addOne(line, {"reference-names", "rin", "The names of the associations of an object"}, Results::Names, addAssociation,
+         showReferenceNames)
       .examples("  zorvactl rin 'ZORVA_DNSProtocolEndPoint.Name=\"eth0\"' --result-class ZORVA_DNSHostedAccessPoint");
 }
 

@@ -1,7 +1,7 @@
 #include "cli/commands/CommandLine.h"
 
-// The only source that includes CLI11, because its headers take long to compile. Its templates are not used for the
-// same reason: options are read by callbacks.
+// The only source here that includes CLI11, because its headers take long to compile. Its templates are not used for
+// the same reason: options are read by callbacks.
 #include <CLI/CLI.hpp>
 #include <algorithm>
 #include <charconv>
@@ -11,14 +11,14 @@
 #include "cli/output/Console.h"
 #include "cli/output/Failure.h"
 #include "cli/output/Text.h"
+#include "manual/AppTree.h"
 
 namespace zorva::cli {
 
 namespace {
 
-constexpr const char* kExamples = R"(
-Examples:
-  zorvactl show                                          all at a glance; show eth0: all of one
+constexpr const char* kExamples =
+    R"(  zorvactl show                                          all at a glance; show eth0: all of one
   zorvactl check                                         do the servers answer?
   zorvactl ei ZORVA_DNSProtocolEndPoint --output json    the DNS client of each interface
   zorvactl get 'ZORVA_DNSProtocolEndPoint.Name="eth0"'   one of them
@@ -26,10 +26,12 @@ Examples:
   zorvactl ifcfg init eth0                               give eth0 a file of settings
   zorvactl dns set eth0 192.0.2.53 2001:db8::53          and change them
   zorvactl --url https://admin@host1 show                what the server of another host says
-  zorvactl --hosts hosts.txt --user admin show           what those of many hosts say
+  zorvactl --hosts hosts.txt --user admin show           what those of many hosts say)";
+
+constexpr const char* kClosing = R"(
 
 A path may leave out keys where the rest is clear, and take any spelling of names. Exit status: 0 done, 1 the operation
-failed, 2 wrong usage or configuration. "zorvactl SUBCOMMAND --help" tells more.)";
+failed, 2 wrong usage or configuration. "zorvactl help SUBCOMMAND" tells more.)";
 
 }  // namespace
 
@@ -307,11 +309,15 @@ void CommandLine::Registered::placeFooters(CLI::App& above) const {
 }
 
 Completion CommandLine::Registered::completionAt(const CLI::App& at, std::size_t positional) const {
-  Completion completion{shownSubcommandsOf(at), {}};
+  Completion completion{shownSubcommandsOf(at)};
+  for (const CLI::App* each : subcommandsOf(at)) completion.meanings[each->get_name()] = each->get_description();
   std::vector<const CLI::Option*> positionals;
   for (const CLI::App* each = &at; each != nullptr; each = each->get_parent()) {
     for (const CLI::Option* option : each->get_options()) {
-      for (const std::string& name : option->get_lnames()) addOnce(completion.words, "--" + name);
+      for (const std::string& name : option->get_lnames()) {
+        addOnce(completion.words, "--" + name);
+        completion.meanings.emplace("--" + name, option->get_description());
+      }
       if (option->get_positional() && each == &at) positionals.push_back(option);
     }
   }
@@ -394,9 +400,8 @@ Subcommand& Subcommand::words(const std::string& name, const std::string& descri
 }
 
 Subcommand& Subcommand::choice(const std::string& name, const std::string& description,
-                               std::vector<std::string> choices) {
-  const auto read = [](const CLI::results_t&) { return true; };
-  CLI::Option* option = app_.add_option(name, read, description)->type_name("TEXT")->required();
+                               std::vector<std::string> choices, std::string& into) {
+  CLI::Option* option = addText(app_, name, description, into)->required();
   const auto isOne = [choices](const std::string& word) {
     const bool isAmong = std::find(choices.begin(), choices.end(), word) != choices.end();
     return isAmong ? std::string() : word + " not in {" + joined(choices, ",") + "}";
@@ -463,7 +468,7 @@ void CommandLine::run() const {
 std::optional<Telling> CommandLine::read(int argc, const char* const* argv) {
   CLI::App& app = registered_->app;
   registered_->placeFooters(app);
-  app.footer(kExamples);
+  app.footer(std::string("\nExamples:\n") + kExamples + kClosing);
   try {
     app.parse(argc, argv);
   } catch (const CLI::CallForHelp&) {
@@ -495,9 +500,22 @@ Completion CommandLine::completionAfter(const std::vector<std::string>& words) c
     }
   }
   if (waiting == nullptr) return registered_->completionAt(*at, positional);
-  Completion completion{{}, waiting->get_type_name()};
+  Completion completion{.words = {}, .kind = waiting->get_type_name()};
   if (completion.kind == "FORMAT") completion.words = namesOf(registered_->formatsOf(*at));
   return completion;
+}
+
+manual::Command CommandLine::description() const {
+  const auto complete = [this](const CLI::App& app, manual::Command& command) {
+    const auto lines = registered_->examples.find(&app);
+    if (lines != registered_->examples.end()) command.examples = lines->second;
+    if (app.get_parent() == nullptr) {
+      command.examples = kExamples;
+    } else {
+      command.outputs = namesOf(registered_->formatsOf(app));
+    }
+  };
+  return manual::commandOf(registered_->app, complete);
 }
 
 }  // namespace zorva::cli

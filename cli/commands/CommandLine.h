@@ -4,6 +4,7 @@
 // Help, completion and the errors of wrong usage are made of what is registered.
 
 #include <functional>
+#include <map>
 #include <memory>
 #include <optional>
 #include <string>
@@ -13,6 +14,7 @@
 
 #include "cli/commands/HostsRun.h"
 #include "cli/session/Globals.h"
+#include "manual/Command.h"
 #include "util/NotCopied.h"
 
 namespace CLI {
@@ -31,10 +33,12 @@ struct Telling {
 
 /// The possible words at a place of the command line.
 struct Completion {
-  std::vector<std::string> words;  ///< subcommands, options, or the values of an option
+  std::vector<std::string> words;                    ///< subcommands, options, or the values of an option
+  std::map<std::string, std::string> meanings = {};  ///< of some of them
   /// Other possible words: "CLASS", "PATH", "INTERFACE", "OLD" (an interface that is gone), "METHOD", "PROPERTY",
-  /// "ROLE", and with a "=" after them "PROPERTY=" and "PARAMETER="; there is no list of others.
-  std::string kind;
+  /// "ROLE", "FILE", "DIR", "COMMAND", and with a "=" after them "PROPERTY=" and "PARAMETER="; there is no list of
+  /// others.
+  std::string kind = {};
 };
 
 /// How many words may be given at the last place: any number; at least one; one.
@@ -88,7 +92,8 @@ class Subcommand {
                     const std::string& kind = {});
 
   /// A word that must be one of these.
-  Subcommand& choice(const std::string& name, const std::string& description, std::vector<std::string> choices);
+  Subcommand& choice(const std::string& name, const std::string& description, std::vector<std::string> choices,
+                     std::string& into);
 
   /// An option with a value of this kind: "--role".
   Subcommand& option(const std::string& name, const std::string& kind, const std::string& description,
@@ -135,6 +140,9 @@ class CommandLine : util::NotCopied {
   /// Runs the command that was read. Throws what that throws, and Failure (wrong usage) if it does not write the format
   /// that is asked for, or cannot use the server that is given.
   void run() const;
+
+  /// What is registered, without what is hidden.
+  manual::Command description() const;
 
   /// The possible words after these words.
   Completion completionAfter(const std::vector<std::string>& words) const;

@@ -7,7 +7,7 @@ void addCommands(CommandLine& line) {
   for (const auto add : {addShowCommand, addCheckCommand, addTreeCommand, addClassesCommand, addGraphCommand,
                          addReadCommands, addAssociationCommands, addModifyCommand, addInvokeCommand, addIfcfgCommands,
                          addDnsCommands, addDomainCommand, addSuffixesCommands, addOverlayCommands, addApplyCommands,
-                         addUserCommands, addRegisterCommands, addCompletionCommands}) {
+                         addUserCommands, addRegisterCommands, addCompletionCommands, addManualCommands}) {
     add(line);
   }
 }

@@ -28,5 +28,9 @@ void addApplyCommands(CommandLine& line);
 void addUserCommands(CommandLine& line);
 void addRegisterCommands(CommandLine& line);
 void addCompletionCommands(CommandLine& line);
+void addManualCommands(CommandLine& line);
+
+/// The script for "bash", "zsh" or "fish".
+std::string completionScript(const std::string& shell);
 
 }  // namespace zorva::cli
