@@ -25,9 +25,7 @@ once. If the file is wrong, the log says why and all stays as it was.
 
 ## FILES
 = </etc/zorvagent/zorvacimd.toml>
-the configuration
-= <examples/zorvacimd.toml>
-in the package's documentation: every key with its default
+The configuration. The package brings a sample of it with every key commented out.
 
 ## EXAMPLES
 A server that other hosts reach, for the users of the file of users alone:
