@@ -25,6 +25,17 @@ if(ZORVA_CCACHE)
   add_compile_options("$<$<COMPILE_LANG_AND_ID:CXX,GNU>:-fpch-preprocess>")
 endif()
 
+# Code that runs once in a command or at a start of the server, and is long: half as large, at no cost that is noticed.
+set(ZORVA_SMALL_CODE "$<$<CONFIG:Release>:-Os>")
+function(zorva_prefer_small_code)
+  foreach(target ${ARGN})
+    target_compile_options(${target} PRIVATE ${ZORVA_SMALL_CODE})
+  endforeach()
+endfunction()
+# What no program uses of a library is left out.
+add_compile_options("$<$<CONFIG:Release>:-ffunction-sections;-fdata-sections>")
+add_link_options("$<$<CONFIG:Release>:-Wl,--gc-sections>")
+
 # The platform symbol of CMPI; the headers refuse to compile without one.
 add_compile_definitions(CMPI_PLATFORM_LINUX_GENERIC_GNU)
 

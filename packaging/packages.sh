@@ -10,7 +10,8 @@ deb_version() {
   printf '%s' "$version"
 }
 
-# build_debs FOLDER: builds the packages of this checkout in a fresh copy below FOLDER. The files *.deb are in FOLDER.
+# build_debs FOLDER: builds the packages of this checkout in a fresh copy below FOLDER. The files *.deb are in FOLDER, what is
+# for debuggers in FOLDER/debug.
 build_debs() {
   local folder=$1 version source log
   version=$(deb_version) || exit 1
@@ -21,12 +22,13 @@ build_debs() {
   # Only one build at a time.
   exec 9>"$folder".lock
   flock 9
-  rm -rf "$source" "$folder"/*.deb "$folder"/*.changes "$folder"/*.buildinfo
+  rm -rf "$source" "$folder"/*.deb "$folder/debug"
   mkdir "$source" && tar -c --exclude=./build --exclude=./.git . | tar -x -C "$source" && cp -r packaging/debian "$source/debian" ||
     die "cannot write to $PWD/$folder"
   printf 'Building the packages of version %s (some minutes)\n' "$version" >&2
   with_progress "$log" build_in "$source" || build_failed "$log"
   rm -rf "$source"
+  mkdir "$folder/debug" && mv "$folder"/*-dbgsym_* "$folder"/*.changes "$folder"/*.buildinfo "$folder/debug" || exit
   exec 9>&-
 }
 
@@ -44,7 +46,6 @@ show_debs() {
   local deb sum=0 kib
   printf '%-50s %10s %14s\n' PACKAGE 'FILE, KiB' 'INSTALLED, KiB'
   for deb in "$1"/*.deb; do
-    case $deb in *-dbgsym_*) continue ;; esac
     kib=$(dpkg-deb -f "$deb" Installed-Size)
     sum=$((sum + kib))
     printf '%-50s %10d %14d\n' "${deb##*/}" "$((($(stat -c %s "$deb") + 1023) / 1024))" "$kib"

@@ -60,6 +60,8 @@ std::optional<Server> serverInstead(const Globals& globals, Need need) {
   return std::nullopt;
 }
 
+bool mayReadSettings() { return mayReach(Need::Read); }
+
 std::string hintForUnprivileged() {
   if (mayReach(Need::Change)) return {};
   return "run it as root; or, where zorvacimd runs, as a member of the group zorva with --url unix:";

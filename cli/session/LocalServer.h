@@ -18,6 +18,9 @@ enum class Need { Read, Change };
 /// another host's settings. A warning tells if settings cannot be read at all.
 std::optional<Server> serverInstead(const Globals& globals, Need need);
 
+/// Whether this user may read what is stored in the data directory; if not, serverInstead has told so.
+bool mayReadSettings();
+
 /// What a user may do who may not write to the data directory; empty if that is not the reason.
 std::string hintForUnprivileged();
 

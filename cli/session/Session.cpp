@@ -64,12 +64,19 @@ std::string similarName(const schema::ClassRepository& classes, std::string_view
   return near.empty() ? "zorvactl classes lists them" : "did you mean " + near + "?";
 }
 
+/// Prints a line of the agent's own. That files of the data directory cannot be read is left out if this user may not
+/// read any there: a warning has said so.
+void tellOwn(const std::string& line) {
+  if (!mayReadSettings() && line.find(zorva::agent::dataDirectory()) != std::string::npos) return;
+  tellWarning(printable(line));
+}
+
 /// Drops the providers' lines, and prints the agent's own.
 class QuietLog : public zorva::agent::LogSink {
  public:
   void record(const zorva::agent::LogCall& /*call*/) override {}
   void recordOwn(int level, const std::string& message) override {
-    if (level >= util::kLevelWarning) tellWarning(printable(message));
+    if (level >= util::kLevelWarning) tellOwn(message);
   }
 };
 
@@ -84,7 +91,7 @@ class HeldBackLog : public zorva::agent::LogSink {
     if (level >= level_) lines_.push_back(message);
   }
   void tell() const {
-    for (const std::string& line : lines_) tellWarning(printable(line));
+    for (const std::string& line : lines_) tellOwn(line);
   }
 
  private:

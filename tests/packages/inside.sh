@@ -69,6 +69,7 @@ step_show() {
   check 'root sees eth0' says 192.0.2.53 zorvactl show
   check 'so does any user' says 192.0.2.53 as nobody zorvactl show
   check 'with exit status 0' as nobody zorvactl --quiet show
+  check 'with one warning, of what this user may not read' is "$(as nobody zorvactl show 2>&1 >/dev/null | wc -l)" 1
   check 'any user sees an interface' says example.org as nobody zorvactl show eth0
   check 'root can make a settings file' zorvactl --quiet ifcfg init eth0
   check 'and change it' zorvactl --quiet dns set eth0 192.0.2.1

@@ -21,8 +21,8 @@ verdict() { # SENTENCE STATUS
 check_reproducible() {
   local again=build/package-again/somewhere/else
   CCACHE_DISABLE=1 build_debs "$again"
-  (cd build/package && sha256sum -- *.deb) >build/package/sums
-  (cd "$again" && sha256sum -- *.deb) | diff build/package/sums - >&2
+  (cd build/package && sha256sum -- *.deb debug/*.deb) >build/package/sums
+  (cd "$again" && sha256sum -- *.deb debug/*.deb) | diff build/package/sums - >&2
   verdict 'two builds give the same bytes' $?
 }
 
@@ -34,7 +34,7 @@ check_size() {
 
 check_lintian() {
   local said
-  said=$(lintian --allow-root --pedantic build/package/*.changes 2>&1)
+  said=$(lintian --allow-root --pedantic build/package/*.deb 2>&1)
   [ -z "$said" ] || printf '%s\n' "$said"
   [ -z "$said" ]
   verdict 'lintian has nothing to say at its pedantic level' $?
@@ -46,7 +46,6 @@ next_version() {
   version=$(deb_version)
   mkdir -p "$1"
   for deb in build/package/*.deb; do
-    case $deb in *-dbgsym_*) continue ;; esac
     rm -rf "$tree"
     dpkg-deb -R "$deb" "$tree" && sed -i "s/\b${version//./\\.}\b/$version+next/" "$tree/DEBIAN/control" || return
     if [ -f "$tree/etc/zorvagent/agent.toml" ]; then
@@ -77,9 +76,7 @@ check_installation() {
   make_base
   fresh_root system
   mkdir -p "$root/packages/next"
-  for deb in build/package/*.deb; do
-    case $deb in *-dbgsym_*) ;; *) cp "$deb" "$root/packages/" ;; esac
-  done
+  cp build/package/*.deb "$root/packages/"
   next_version "$root/packages/next" || die "cannot make packages of the next version"
   cp tests/packages/inside.sh "$root/packages/"
   printf 'Fetching what the packages need\n' >&2
