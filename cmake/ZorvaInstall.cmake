@@ -26,7 +26,7 @@ endfunction()
 # the places that InstallPlaces.cmake.in names. DESTINATION is in the prefix or absolute.
 function(zorva_install_configured template destination)
   get_filename_component(name ${template} NAME_WLE)
-  set(made ${CMAKE_BINARY_DIR}/installed/${name})
+  set(made ${CMAKE_BINARY_DIR}/installed/${destination}/${name})
   install(CODE "
     include(\"${ZORVA_INSTALL_PLACES}\")
     configure_file(\"${template}\" \"${made}\" @ONLY)
@@ -64,14 +64,9 @@ function(zorva_add_uninstall)
     VERBATIM)
 endfunction()
 
-zorva_install_configured(${CMAKE_SOURCE_DIR}/packaging/systemd/zorva.conf.in lib/sysusers.d)
-# With another prefix than /usr the units do not make the data directory.
-install(CODE "
-  include(\"${ZORVA_INSTALL_PLACES}\")
-  if(NOT ZORVA_IS_SYSTEM)
-    configure_file(\"${CMAKE_SOURCE_DIR}/packaging/systemd/zorva.tmpfiles.in\" \"${CMAKE_BINARY_DIR}/installed/tmpfiles/zorva.conf\" @ONLY)
-    file(INSTALL \"${CMAKE_BINARY_DIR}/installed/tmpfiles/zorva.conf\" DESTINATION \"\${CMAKE_INSTALL_PREFIX}/lib/tmpfiles.d\")
-  endif()")
+foreach(kind sysusers tmpfiles)
+  zorva_install_configured(${CMAKE_SOURCE_DIR}/packaging/systemd/${kind}/zorva.conf.in lib/${kind}.d)
+endforeach()
 
 # For those who write providers.
 file(GLOB headers CONFIGURE_DEPENDS ${CMAKE_SOURCE_DIR}/agent/interface/*.h)

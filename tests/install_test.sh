@@ -73,7 +73,7 @@ cmake --install "$build" --prefix /usr >/dev/null
 test -f "$DESTDIR/etc/zorvagent/agent.toml"
 grep -qx 'ExecStart=/usr/sbin/zorvacimd' "$DESTDIR/usr/lib/systemd/system/zorvacimd.service"
 grep -qx 'StateDirectory=zorvagent' "$DESTDIR/usr/lib/systemd/system/zorvacimd.service"
-test ! -e "$DESTDIR/usr/lib/tmpfiles.d"
+grep -qx 'd /var/lib/zorvagent 0750 zorva zorva -' "$DESTDIR/usr/lib/tmpfiles.d/zorva.conf"
 cmake --build "$build" --target uninstall >/dev/null
 left=$(find "$DESTDIR" ! -type d -o -name '*zorva*')
 [ -z "$left" ] || die "uninstall leaves $left"
