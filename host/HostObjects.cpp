@@ -6,6 +6,7 @@
 #include <set>
 #include <string_view>
 
+#include "agent/interface/PlatformUtilities.h"
 #include "host/SubnetMask.h"
 #include "util/ReadFile.h"
 #include "util/Text.h"
@@ -179,7 +180,7 @@ HostObject ipAssignment(const std::string& instanceID, const Interface& interfac
 }  // namespace
 
 std::vector<HostObject> computerSystems(const agent::TreeSnapshot& tree) {
-  std::vector<HostObject> objects = {hostSystem(tree.systemName())};
+  std::vector<HostObject> objects = {hostSystem(ZV::getSystemName())};
   for (const agent::Node& node : tree.nodes()) {
     if (!node.isServiceProcessor()) continue;
     objects.push_back(serviceProcessor());
@@ -194,6 +195,7 @@ std::vector<HostObject> ipEndpoints(const agent::TreeSnapshot& tree) {
   for (const Interface& interface : all) names.insert(interface.name);
 
   std::vector<HostObject> objects;
+  const std::string systemName = ZV::getSystemName();
   std::set<std::string> begun;  // interfaces whose first address already has the plain name
   for (const Interface& interface : all) {
     unsigned int ordinal = 1;
@@ -204,7 +206,7 @@ std::vector<HostObject> ipEndpoints(const agent::TreeSnapshot& tree) {
           name = interface.name + "_" + std::to_string(++ordinal);
         } while (!names.insert(name).second);
       }
-      objects.push_back(ipEndpoint(interface, address, name, tree.systemName()));
+      objects.push_back(ipEndpoint(interface, address, name, systemName));
     }
   }
   return objects;
