@@ -1,5 +1,5 @@
 #!/bin/sh
-# The manual pages that the programs write: groff, man and mandoc have nothing to say of them, and every page that they
+# The manual pages, most of which the programs write: groff, man and mandoc have nothing to say of them, and every page that they
 # refer to is there.
 #
 #   manual_pages.sh BUILD-FOLDER
@@ -9,6 +9,7 @@ folder=$(mktemp -d)
 trap 'rm -rf "$folder"' EXIT
 "$1/bin/zorvactl" manual "$folder"
 "$1/bin/zorvacimd" --manual "$folder"
+cp "$(dirname "$0")/../bmc/zorva-bmc.8" "$folder/man8"
 cd "$folder"
 
 for page in man*/*; do

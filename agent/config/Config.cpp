@@ -71,11 +71,11 @@ void readLog(Config& config, const util::TomlDocument& document) {
   log.finish();
 }
 
-// A fingerprint as programs print it, with or without colons.
+// A fingerprint as programs print it, with or without colons and blanks.
 std::string settledFingerprint(const std::string& text) {
   std::string digits;
   for (const char c : text) {
-    if (c != ':') digits += util::lowerAscii(c);
+    if (c != ':' && c != ' ') digits += util::lowerAscii(c);
   }
   return digits;
 }
