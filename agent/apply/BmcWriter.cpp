@@ -52,7 +52,7 @@ bool sendAll(int socket, std::string_view text) {
   return ::shutdown(socket, SHUT_WR) == 0;
 }
 
-// A change of a slow service processor, after the reading that is in progress, takes up to two minutes and a half.
+// zorva-bmc allows a change 60 s. An answer that takes longer, because a slow reading came before it, counts as none.
 std::string receiveAll(int socket) {
   constexpr std::chrono::seconds kLongest{75};
   constexpr std::size_t kLargest = std::size_t{1} << 20U;
