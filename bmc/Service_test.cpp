@@ -82,6 +82,12 @@ TEST_F(ServiceTest, ReadsEveryInterfaceOfEveryManager) {
   EXPECT_NEAR(static_cast<double>(now.readAt), static_cast<double>(std::time(nullptr)), 60);
 }
 
+TEST_F(ServiceTest, TheAnswersOfTheTestsServiceAreCheckedBySchemasWhereThereAreAny) {
+  if (std::string(ZORVA_REDFISH_SCHEMA_DIR).empty()) GTEST_SKIP() << "ZORVA_REDFISH_SCHEMA_DIR names no schemas";
+  ASSERT_TRUE(service()->readOnce());
+  EXPECT_GT(redfish_.tell({{"invalid", true}})["checked"], 0) << "Python's package jsonschema is needed";
+}
+
 TEST_F(ServiceTest, TheFileIsForOwnerAndGroupAndHoldsNoPassword) {
   ASSERT_TRUE(service()->readOnce());
   struct stat status {};
