@@ -3,31 +3,16 @@
 #include <gtest/gtest.h>
 
 #include "agent/testing/TemporaryDirectory.h"
+#include "bmc/testing/TestFirmware.h"
 
 namespace zorva::bmc {
 namespace {
 
 using namespace std::string_literals;
 
-std::string structure(int type, const std::string& data, const std::string& texts = "\0\0"s) {
-  return std::string{static_cast<char>(type), static_cast<char>(4 + data.size()), 0, 0} + data + texts;
-}
-
-// The record of a Redfish service over IP.
-std::string record(int format, const std::string& address, int port) {
-  std::string data(91, '\0');
-  data[51] = static_cast<char>(format);
-  data.replace(52, address.size(), address);
-  data[84] = static_cast<char>(port & 0xFF);
-  data[85] = static_cast<char>(port >> 8);
-  return data;
-}
-
-std::string controller(const std::string& data, int protocol = 4, int interfaceType = 0x40) {
-  return structure(42, std::string{static_cast<char>(interfaceType), 2, 2, 0, 1, static_cast<char>(protocol),
-                                   static_cast<char>(data.size())} +
-                           data);
-}
+using testing::controller;
+using testing::record;
+using testing::structure;
 
 const std::string kBios = structure(0, "\1\2\3"s, "maker\0version\0\0"s);
 const std::string kEnd = structure(127, "");

@@ -65,6 +65,7 @@ struct Https::Transfer : util::NotCopied {
   std::size_t headSize = 0;
   bool isTooLarge = false;
   std::string wrongFingerprint;
+  std::string whyNotKnown;  ///< the right fingerprint
   char problem[CURL_ERROR_SIZE] = {};
 
   bool isCancelled() const { return https.isCancelled_ != nullptr && *https.isCancelled_; }
@@ -106,11 +107,9 @@ struct Https::Transfer : util::NotCopied {
           std::string(address) + " " + std::to_string(port) + " " + localAddress + " " + std::to_string(localPort);
       const std::string found = fingerprintIn(https.easy_);
       if (found.empty()) return ends == https.checked_ ? CURL_PREREQFUNC_OK : CURL_PREREQFUNC_ABORT;
-      if (found == https.trust_.fingerprint) {
-        https.checked_ = ends;
-        return CURL_PREREQFUNC_OK;
-      }
-      transfer.wrongFingerprint = found;
+      if (!https.isTrusted(transfer, found)) return CURL_PREREQFUNC_ABORT;
+      https.checked_ = ends;
+      return CURL_PREREQFUNC_OK;
     } catch (...) {
       // The request is not sent.
     }
@@ -127,8 +126,20 @@ Https::Https(std::string url, Trust trust) : url_(std::move(url)), trust_(std::m
 
 Https::~Https() { ::curl_easy_cleanup(easy_); }
 
+bool Https::isTrusted(Transfer& transfer, const std::string& fingerprint) {
+  try {
+    const bool isAskedFor = fingerprint != trust_.fingerprint && trust_.currentFingerprint;
+    if (isAskedFor) trust_.fingerprint = trust_.currentFingerprint();
+  } catch (const Failed& error) {
+    transfer.whyNotKnown = error.what();
+  }
+  if (fingerprint == trust_.fingerprint) return true;
+  transfer.wrongFingerprint = fingerprint;
+  return false;
+}
+
 void Https::placeTrust(Transfer& transfer) {
-  if (trust_.fingerprint.empty()) {
+  if (trust_.fingerprint.empty() && !trust_.currentFingerprint) {
     if (trust_.caFile.empty()) return;
     ::curl_easy_setopt(easy_, CURLOPT_CAINFO, trust_.caFile.c_str());
     // Else those of the system are trusted as well.
@@ -196,9 +207,12 @@ Reply Https::send(const Request& request) {
 void Https::fail(const Transfer& transfer, int code) const {
   if (transfer.isTooLarge) throw Failed("an answer of " + url_ + " is too large");
   if (!transfer.wrongFingerprint.empty()) {
-    throw Failed("the certificate of " + url_ +
-                 " is not the one of [bmc] fingerprint; nothing was sent. Its SHA-256 is " + transfer.wrongFingerprint +
-                 ": compare it with what the service processor itself shows");
+    const char* const expected = trust_.currentFingerprint
+                                     ? " is not known to be the one that the service processor names over IPMI"
+                                     : " is not the one of [bmc] fingerprint";
+    throw Failed("the certificate of " + url_ + expected + "; nothing was sent. Its SHA-256 is " +
+                 transfer.wrongFingerprint + ": compare it with what the service processor itself shows" +
+                 (transfer.whyNotKnown.empty() ? "" : " (" + transfer.whyNotKnown + ")"));
   }
   if (transfer.isCancelled()) throw Failed("interrupted");
   const auto curlCode = static_cast<CURLcode>(code);

@@ -4,6 +4,7 @@
 
 #include <atomic>
 #include <chrono>
+#include <functional>
 #include <memory>
 #include <stdexcept>
 #include <string>
@@ -28,6 +29,9 @@ using Clock = std::chrono::steady_clock;
 struct Trust {
   std::string caFile;       ///< authorities; empty: the system's
   std::string fingerprint;  ///< SHA-256, 64 lower-case digits; not empty: nothing else is checked
+  /// What the fingerprint is by now. Asked when a certificate has another one, before anything is sent; throws Failed
+  /// if that is not known. Set: only fingerprints are checked.
+  std::function<std::string()> currentFingerprint{};
 };
 
 struct Request {
@@ -72,10 +76,11 @@ class Https : util::NotCopied {
   struct Transfer;
   void place(Transfer& transfer, const Request& request);
   void placeTrust(Transfer& transfer);
+  bool isTrusted(Transfer& transfer, const std::string& fingerprint);
   [[noreturn]] void fail(const Transfer& transfer, int code) const;
 
   const std::string url_;
-  const Trust trust_;
+  Trust trust_;
   Clock::time_point deadline_ = Clock::time_point::max();
   const std::atomic<bool>* isCancelled_ = nullptr;
   std::string checked_;  ///< the ends of the connection whose fingerprint was right

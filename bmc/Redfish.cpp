@@ -297,14 +297,30 @@ std::string Redfish::finishTask(const Reply& accepted) {
   }
 }
 
+/// A login that is refused may have been replaced by now: that one is tried at once.
 void Redfish::logIn() {
-  constexpr std::chrono::minutes kAfterRefusal{10};
-  const Login login = login_();
+  Login login = login_(refused_.get());
   // Another attempt with the same password could lock the account.
-  if (refused_ != nullptr && refused_->text() == login.password->text() && Clock::now() < refusedUntil_) {
+  if (isRefused(login) && Clock::now() < refusedUntil_) {
     throw Failed(https_.url() + " refused the login of " + shortLine(login.user) +
                  "; it is tried again after ten minutes, or with another password in its file");
   }
+  long status = openSession(login);
+  if (status == 0) return;
+  login = login_(refused_.get());
+  if (!isRefused(login)) status = openSession(login);
+  if (status == 0) return;
+  throw Failed(https_.url() + " refused the login of " + shortLine(login.user) + " (" + std::to_string(status) +
+               "); see [bmc] user and password_file");
+}
+
+bool Redfish::isRefused(const Login& login) const {
+  return refused_ != nullptr && refused_->text() == login.password->text();
+}
+
+/// The status with which the service refuses the login; 0: it does not.
+long Redfish::openSession(const Login& login) {
+  constexpr std::chrono::minutes kAfterRefusal{10};
   std::string path = "/redfish/v1/SessionService/Sessions";
   const JsonValue* links = memberOf(root(), "Links", Kind::Object);
   const JsonValue* sessions = links == nullptr ? nullptr : memberOf(*links, "Sessions", Kind::Object);
@@ -319,8 +335,7 @@ void Redfish::logIn() {
   if (reply.status == kUnauthorized || reply.status == kForbidden || reply.status == kBadRequest) {
     refused_ = login.password;
     refusedUntil_ = Clock::now() + kAfterRefusal;
-    throw Failed(https_.url() + " refused the login of " + shortLine(login.user) + " (" + std::to_string(reply.status) +
-                 "); see [bmc] user and password_file");
+    return reply.status;
   }
   if (reply.status < kOk || reply.status >= kMultipleChoices) fail(request, reply);
   refused_.reset();
@@ -331,6 +346,7 @@ void Redfish::logIn() {
   }
   const std::string_view location = reply.field("Location");
   session_ = location.empty() ? std::string() : pathIn(location);
+  return 0;
 }
 
 void Redfish::logOut() noexcept try {

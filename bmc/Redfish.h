@@ -23,7 +23,8 @@ struct Login {
   std::string user;
   std::shared_ptr<const util::Secret> password;
 };
-using LoginSource = std::function<Login()>;
+/// Gets the password that the service refused last, or null, and throws Failed if there is no login that may be tried.
+using LoginSource = std::function<Login(const util::Secret* refused)>;
 
 struct Resource {
   JsonValue body;
@@ -89,6 +90,8 @@ class Redfish : util::NotCopied {
   std::string finishTask(const Reply& accepted);
   bool isOver(const Reply& reply, std::string& remarks);
   void logIn();
+  bool isRefused(const Login& login) const;
+  long openSession(const Login& login);
   bool expands();
   std::string collectionPath(const std::string& collection);
   JsonValue bodyOf(const Reply& reply, const std::string& path) const;

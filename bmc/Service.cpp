@@ -114,7 +114,7 @@ WantedDns wantedIn(const JsonValue& request) {
 std::string socketBeside(const std::string& file) { return directoryOf(file) + "bmc.sock"; }
 
 LoginSource loginFromFile(const std::string& user, const std::string& passwordFile) {
-  return [user, passwordFile] {
+  return [user, passwordFile](const util::Secret*) {
     constexpr std::size_t kLongest = 4096;
     constexpr unsigned int kOthers = 077;
     util::FileText file = util::readFile(passwordFile, kLongest);

@@ -2,15 +2,17 @@
 
 // Which service is asked: the configured one, or the one that the firmware names.
 
-#include <optional>
+#include <memory>
 #include <string>
 
 #include "agent/config/Config.h"
+#include "bmc/Ipmi.h"
 #include "bmc/Service.h"
 
 namespace zorva::bmc {
 
-/// Nothing if there is none. Throws Failed if the firmware names one, and there is no login for it.
-std::optional<Target> findTarget(const agent::BmcConfig& config, const std::string& smbiosTable);
+/// Throws NotOffered if there is no service, or no login for it. The service that the firmware names is asked over IPMI
+/// for what the configuration does not say: its certificate, and an account.
+Target findTarget(const agent::BmcConfig& config, const std::string& smbiosTable, std::shared_ptr<Ipmi> ipmi);
 
 }  // namespace zorva::bmc

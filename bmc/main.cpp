@@ -64,12 +64,7 @@ bool read(int argc, char** argv, Options& options, int& status) {
 
 int serve(const Options& options) {
   const agent::Config config = options.config.empty() ? agent::readDefaultConfig() : agent::readConfig(options.config);
-  std::optional<bmc::Target> target = bmc::findTarget(config.bmc, bmc::kSmbiosTable);
-  if (!target || config.bmc.file.empty()) {
-    std::fputs("zorva-bmc: no service processor is configured ([bmc] url), and the firmware names none\n", stderr);
-    return options.once ? 1 : 0;
-  }
-  bmc::Service service(config.bmc, std::move(*target));
+  bmc::Service service(config.bmc, bmc::findTarget(config.bmc, bmc::kSmbiosTable, bmc::makeIpmiDevice()));
   running = &service;
   stopAtSignals();
   bool done = true;
@@ -91,6 +86,10 @@ int main(int argc, char** argv) {
   if (!read(argc, argv, options, status)) return status;
   try {
     return serve(options);
+  } catch (const bmc::NotOffered& error) {
+    // A service that was started again would find the same.
+    std::fprintf(stderr, "zorva-bmc: %s\n", error.what());
+    return options.once ? 1 : 0;
   } catch (const std::exception& error) {
     std::fprintf(stderr, "zorva-bmc: %s\n", error.what());
     return 1;

@@ -9,7 +9,8 @@ with one line:
   {"set": {"PATH": {"FQDN": null}}}      changes a resource; null removes a property
   {"log": true}                          the requests since the last time
   {"get": "PATH"}                        a resource as it is
-  {"invalid": true}                      the answers that DMTF's schemas refuse, where their folder is given
+  {"invalid": true}                      how many answers were checked by DMTF's schemas, where their folder is given, and
+                                         which of them they refuse
 It ends with its standard input.
 """
 import copy
@@ -30,7 +31,9 @@ SWITCHES = {
     "patch": 204,        # 200, 202, 204; 400 with ExtendedInfo; 503 or 412 once; 429
     "task": "Completed", # the end of a task after a 202; "Exception" fails
     "login": 201,        # 401 refuses everybody
+    "account": [USER, PASSWORD],  # the one that may log in; others' sessions end when it changes
     "requests_of_session": 0,  # after that many the session has expired; 0: never
+    "close": False,      # each connection ends after its first answer
     "uses_both": False,  # servers set by hand are used beside those of DHCP
     "wrong": "",         # "html", "deep", "huge", "values", "trickle", "silent", "redirect", "far", "loop", "cycle", "many",
                          # "head", "outside", "list", "busy"
@@ -151,6 +154,8 @@ class Service:
                         body.pop(name, None)
                     else:
                         body[name] = value
+            if "account" in line:
+                self.sessions.clear()
             self.switches.update(line)
             self.once = self.switches["patch"]
             return "ok"
@@ -218,6 +223,8 @@ class Handler(http.server.BaseHTTPRequestHandler):
                 self.send_header(name.replace("_", "-"), value)
         if status != 304:
             self.send_header("Content-Length", str(len(text)))
+        if self.service.switches["close"]:
+            self.send_header("Connection", "close")  # the base class then closes it
         self.end_headers()
         self.wfile.write(text)
 
@@ -345,14 +352,14 @@ class Handler(http.server.BaseHTTPRequestHandler):
         service = self.service
         with service.lock:
             self.record(body)
-            if service.switches["login"] != 201 or body != {"UserName": USER, "Password": PASSWORD}:
+            if service.switches["login"] != 201 or [body["UserName"], body["Password"]] != service.switches["account"]:
                 return self.answer(401, error("The login is wrong."))
             service.made += 1
             token = f"token-{service.made}"
             path = f"{ROOT}/SessionService/Sessions/{service.made}"
             service.sessions[token] = [path, 0]
         self.answer(201, {"@odata.type": "#Session.v1_8_0.Session", "@odata.id": path, "Id": str(service.made),
-                          "Name": "User Session", "UserName": USER}, X_Auth_Token=token, Location=path)
+                          "Name": "User Session", "UserName": body["UserName"]}, X_Auth_Token=token, Location=path)
 
     def do_DELETE(self):
         with self.service.lock:
