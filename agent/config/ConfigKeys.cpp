@@ -85,7 +85,11 @@ constexpr TomlKey kBmc[] = {
      .standard = R"("")",
      .example = R"("https://192.0.2.20")",
      .meaning = "The Redfish service: `https://HOST` or `https://HOST:PORT`. Empty: the one that the firmware names."},
-    {.name = "user", .standard = R"("")", .example = R"("operator")", .meaning = "The login. It needs `password_file`."},
+    {.name = "user",
+     .standard = R"("")",
+     .example = R"("operator")",
+     .meaning = "The login. It needs `password_file`. Empty, without `url`: an account that the service processor "
+                "offers over IPMI."},
     {.name = "password_file",
      .type = TomlType::Path,
      .standard = R"("")",
