@@ -94,7 +94,7 @@ std::string messagesIn(const JsonValue& body) {
 }
 
 std::string idOf(const JsonValue& reference) {
-  const std::string id = textIn(reference, "@odata.id");
+  std::string id = textIn(reference, "@odata.id");
   if (!isPath(id)) throw Failed("the service processor names a resource that is none: '" + shortLine(id) + "'");
   return id;
 }

@@ -5,7 +5,6 @@
 
 #include <algorithm>
 #include <cerrno>
-#include <cstdint>
 #include <utility>
 
 namespace zorva::http {
@@ -19,8 +18,7 @@ ssize_t push(gnutls_transport_ptr_t records, const void* data, std::size_t size)
 }  // namespace
 
 void JoinedRecords::attach(gnutls_session_t session) {
-  const auto socket = reinterpret_cast<gnutls_transport_ptr_t>(static_cast<std::intptr_t>(socket_));
-  gnutls_transport_set_ptr2(session, socket, this);
+  gnutls_transport_set_ptr2(session, gnutls_transport_get_ptr(session), this);
   gnutls_transport_set_push_function(session, &push);
 }
 

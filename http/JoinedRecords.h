@@ -18,7 +18,7 @@ class JoinedRecords : util::NotCopied {
   /// For a socket that does not block.
   explicit JoinedRecords(int socket) : socket_(socket) {}
 
-  /// Takes over what the session sends. The object must outlive the session.
+  /// Takes over what the session sends; it has its socket already. The object must outlive the session.
   void attach(gnutls_session_t session);
 
   /// The next record waits for the one after it. Call it only where one follows at once.

@@ -10,11 +10,11 @@ bool isRepeatable(const CLI::Option& option) {
   return option.get_items_expected_max() >= CLI::detail::expected_max_vector_size;
 }
 
-Option argumentOf(const CLI::Option& option) {
+DeclaredOption argumentOf(const CLI::Option& option) {
   return {option.get_name(true), {}, {}, option.get_description(), option.get_required(), isRepeatable(option)};
 }
 
-Option optionOf(const CLI::Option& option) {
+DeclaredOption optionOf(const CLI::Option& option) {
   const bool takesValue = option.get_items_expected_max() > 0;
   // A validator's text, as in "N:INT in [0 - 65535]", is part of the type's name.
   const std::string type = option.get_type_name();

@@ -20,7 +20,7 @@ std::string italic(std::string_view text) { return "<" + std::string(text) + ">"
 /// "<INTERFACE> [<SERVER>...]"
 std::string argumentsText(const Command& command) {
   std::string text;
-  for (const Option& each : command.arguments) {
+  for (const DeclaredOption& each : command.arguments) {
     const std::string name = italic(each.name) + (each.isRepeatable ? "..." : "");
     text += " " + (each.isRequired ? name : "[" + name + "]");
   }
@@ -30,7 +30,7 @@ std::string argumentsText(const Command& command) {
 /// "[`--dry-run`] [`--role` <ROLE>]"
 std::string optionsText(const Command& command) {
   std::string text;
-  for (const Option& each : command.options) {
+  for (const DeclaredOption& each : command.options) {
     if (each.name == "--help") continue;
     text += " [" + bold(each.name) + (each.value.empty() ? "" : " " + italic(each.value)) + "]" +
             (each.isRepeatable ? "..." : "");
@@ -38,14 +38,14 @@ std::string optionsText(const Command& command) {
   return text;
 }
 
-std::string optionTerm(const Option& option) {
+std::string optionTerm(const DeclaredOption& option) {
   return (option.brief.empty() ? std::string() : bold(option.brief) + ", ") + bold(option.name) +
          (option.value.empty() ? std::string() : " " + italic(option.value));
 }
 
 /// Every option of a command and of those below it, each once.
-void addOptions(const Command& command, std::vector<Option>& options) {
-  for (const Option& each : command.options) {
+void addOptions(const Command& command, std::vector<DeclaredOption>& options) {
+  for (const DeclaredOption& each : command.options) {
     const bool isThere = std::find(options.begin(), options.end(), each) != options.end();
     if (!isThere && each.name != "--help") options.push_back(each);
   }
@@ -65,17 +65,17 @@ std::vector<Block> synopsisOf(const Command& command) {
 
 std::vector<Block> argumentsOf(const Command& command) {
   std::vector<Block> blocks;
-  for (const Option& each : command.arguments) {
+  for (const DeclaredOption& each : command.arguments) {
     blocks.push_back({Kind::Item, sentence(each.meaning), italic(each.name)});
   }
   return blocks;
 }
 
 std::vector<Block> optionsOf(const Command& command) {
-  std::vector<Option> options;
+  std::vector<DeclaredOption> options;
   addOptions(command, options);
   std::vector<Block> blocks;
-  for (const Option& each : options) blocks.push_back({Kind::Item, sentence(each.meaning), optionTerm(each)});
+  for (const DeclaredOption& each : options) blocks.push_back({Kind::Item, sentence(each.meaning), optionTerm(each)});
   return blocks;
 }
 

@@ -11,7 +11,7 @@
 
 namespace zorva::manual {
 
-struct Option {
+struct DeclaredOption {
   std::string name;   ///< "--output", or of an argument "PATH"
   std::string brief;  ///< "-o", or empty
   std::string value;  ///< "FORMAT"; empty: it takes none
@@ -19,15 +19,15 @@ struct Option {
   bool isRequired = false;
   bool isRepeatable = false;
 
-  bool operator==(const Option&) const = default;
+  bool operator==(const DeclaredOption&) const = default;
 };
 
 struct Command {
   std::string call;  ///< "zorvactl dns set"
   std::string summary;
   std::vector<std::string> aliases;
-  std::vector<Option> arguments;
-  std::vector<Option> options;
+  std::vector<DeclaredOption> arguments;
+  std::vector<DeclaredOption> options;
   std::vector<Command> commands;
   std::string examples;  ///< a line each, with a comment after two blanks or more; a line may go on after "\"
   std::vector<std::string> outputs;  ///< the formats of --output, if there are several

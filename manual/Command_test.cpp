@@ -8,8 +8,8 @@ namespace zorva::manual {
 namespace {
 
 Command command() {
-  const Option help{"--help", "-h", {}, "Print this help message and exit"};
-  const Option dry{"--dry-run", {}, {}, "Show what would be done"};
+  const DeclaredOption help{"--help", "-h", {}, "Print this help message and exit"};
+  const DeclaredOption dry{"--dry-run", {}, {}, "Show what would be done"};
   Command set{"prog dns set", "Replace them", {"s"}, {}, {help, dry}, {}, "  prog dns set eth0 a       one", {}};
   set.arguments = {{"INTERFACE", {}, {}, "The interface", true}, {"SERVER", {}, {}, "The servers", false, true}};
   Command clear{"prog dns clear", "Take them back", {}, {}, {help, dry, {"--file", "-f", "FILE", "Which"}}, {}, {}, {}};

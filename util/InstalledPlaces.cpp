@@ -17,7 +17,7 @@ bool isLibraries(const path& name) { return name == "lib" || name == "lib64"; }
 /// The prefix that a file in this directory belongs to; empty if the directory has none of the usual names.
 path prefixOf(const path& directory) {
   const path name = directory.filename();
-  const path above = directory.parent_path();
+  path above = directory.parent_path();
   if (name == "bin" || name == "sbin" || isLibraries(name)) return above;
   return isLibraries(above.filename()) ? above.parent_path() : path();
 }

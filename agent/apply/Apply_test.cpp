@@ -277,7 +277,8 @@ TEST(StateOfWhatIsApplied, LiesWhereOnlyRootWritesAndTheServersGroupReads) {
   ZORVAGENT_NEEDS_PRIVATE_HOST();
   EXPECT_TRUE(onPlainHost(kBefore, [](ApplyHost& host) {
     host.want("eth0", "DNSSERVERS=192.0.2.1\n");
-    outputOf("chown 65534:65533 /var/lib/zorvagent; mkdir /etc/elsewhere; ln -s /etc/elsewhere /var/lib/zorvagent/applied");
+    outputOf(
+        "chown 65534:65533 /var/lib/zorvagent; mkdir /etc/elsewhere; ln -s /etc/elsewhere /var/lib/zorvagent/applied");
     EXPECT_THAT(problemOf([&] { host.apply(); }), HasSubstr("applied/: is no directory that only its owner, root"));
     outputOf("rm /var/lib/zorvagent/applied; mkdir /var/lib/zorvagent/applied; chown 65534 /var/lib/zorvagent/applied");
     EXPECT_THAT(problemOf([&] { host.apply(); }), HasSubstr("applied/: is no directory that only its owner, root"));

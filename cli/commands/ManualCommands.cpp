@@ -52,7 +52,7 @@ void writeManual(const manual::Command& program, const std::string& directory) {
   const manual::ConfigFile config = agentConfigFile();
   manual::writeFile(directory + "/" + std::string(config.name), manual::sampleOf(config));
   for (const std::string shell : {"bash", "zsh", "fish"}) {
-    manual::writeFile(directory + "/completion/" + shell, completionScript(shell));
+    manual::writeFile(std::string(directory).append("/completion/").append(shell), completionScript(shell));
   }
 }
 

@@ -16,8 +16,8 @@ manual::Command program() {
 }
 
 void expectAllOf(const manual::Command& command, const std::string& page) {
-  for (const manual::Option& each : command.arguments) EXPECT_THAT(page, HasSubstr(each.name)) << command.call;
-  for (const manual::Option& each : command.options) {
+  for (const manual::DeclaredOption& each : command.arguments) EXPECT_THAT(page, HasSubstr(each.name)) << command.call;
+  for (const manual::DeclaredOption& each : command.options) {
     if (each.name != "--help") {
       EXPECT_THAT(page, HasSubstr("\n    " + (each.brief.empty() ? "" : each.brief + ", ") + each.name))
           << command.call;
@@ -33,7 +33,7 @@ TEST(ManualPages, HaveEveryCommandOptionAndArgument) {
   const manual::Command all = program();
   EXPECT_GT(all.commands.size(), 20U);
   const std::string page = manual::textOf(pageOf(all), 80);
-  for (const manual::Option& each : all.options) {
+  for (const manual::DeclaredOption& each : all.options) {
     EXPECT_TRUE(each.name == "--help" || page.find(each.name) != std::string::npos) << each.name;
   }
   for (const manual::Command& each : all.commands) {
