@@ -19,7 +19,7 @@ check() {
 
 quietly() { "$@" >/tmp/apt.log 2>&1 || { cat /tmp/apt.log; return 1; }; }
 apt() { quietly apt-get -y -q --no-install-recommends -o Dpkg::Options::=--force-confold "$@"; }
-ours='zorva zorvactl zorvacimd libzorvagent1 zorva-providers libzorvagent-dev'
+ours='zorva zorvactl zorvacimd libzorvagent1 zorva-bmc zorva-providers libzorvagent-dev'
 
 is() { [ "$1" = "$2" ] || { printf 'is "%s", not "%s"\n' "$1" "$2"; return 1; }; }
 stat_is() { is "$(stat -c '%U:%G %a' "$1")" "$2"; }
@@ -100,7 +100,7 @@ step_upgrade() {
   local before=/tmp/ifcfg-before
   cp /var/lib/zorvagent/ifcfg-eth0 "$before"
   check 'the same packages can be installed again' apt install --reinstall /packages/*.deb
-  sed -i 's/^# port = 5988/port = 5999/' /etc/zorvagent/zorvacimd.toml
+  sed -i 's/^#port = 5988/port = 5999/' /etc/zorvagent/zorvacimd.toml
   echo '# mine' >>/etc/zorvagent/agent.toml
   check 'the next version can be installed' apt install /packages/next/*.deb
   check 'it is installed' is "$(dpkg-query -W -f '${Version}' zorvactl)" "$(dpkg-deb -f /packages/next/zorvactl_*.deb Version)"
