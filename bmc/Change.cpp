@@ -64,14 +64,14 @@ JsonValue propertiesFor(const Ethernet& now, const WantedDns& wanted) {
   const bool setsServers = wanted.servers && withoutPadding(*wanted.servers) != now.servers();
   if (setsServers) {
     if (!now.staticServers) {
-      throw Failed("interface " + now.id + " has no StaticNameServers, so nobody can set its DNS servers by Redfish");
+      throw Failed("interface " + now.id + " has no StaticNameServers: its DNS servers cannot be set by Redfish");
     }
     properties.add(kServers, listOf(withoutPadding(*wanted.servers)));
   }
   const bool setsDomain = wanted.domain && *wanted.domain != now.domain();
   if (setsDomain) {
     if (!now.fqdn || now.hostName.empty()) {
-      throw Failed("interface " + now.id + " has no FQDN or no HostName, so nobody can set its domain by Redfish");
+      throw Failed("interface " + now.id + " lacks FQDN or HostName: its domain cannot be set by Redfish");
     }
     properties.add(kFqdn, JsonValue::ofText(now.hostName + (wanted.domain->empty() ? "" : "." + *wanted.domain)));
   }

@@ -307,7 +307,7 @@ TEST_F(ServiceTest, AnInterfaceWithoutFqdnHasNoDomainAndCannotBeGivenOne) {
   ASSERT_TRUE(writer->readOnce());
   EXPECT_EQ(nodeOf(state(), "/bmc.1/eth0/ip")->text(PROP_DOMAIN_NAME), nullptr);
   EXPECT_THAT(ask(*writer, {{"action", "read"}, {"domain", "example.net"}})["problem"].get<std::string>(),
-              HasSubstr("has no FQDN"));
+              HasSubstr("lacks FQDN or HostName"));
 }
 
 TEST_F(ServiceTest, SeveralManagersWithInterfacesOfOneNameHavePathsOfTheirOwn) {

@@ -1,7 +1,7 @@
 #pragma once
 
-// The markup of help, manual pages and configuration keys: `bold` for what is typed or printed literally, <italic> for
-// names that stand for something, and for files. Texts are ASCII.
+// The markup of help, manual pages and configuration keys: `bold` for what is typed or printed as it is, <italic> for
+// placeholders such as <NAME>, and for files. Texts are ASCII.
 
 #include <cstddef>
 #include <string>

@@ -25,7 +25,7 @@ once. If the file is wrong, the log says why and all stays as it was.
 
 ## FILES
 = </etc/zorvagent/zorvacimd.toml>
-The configuration. The package brings a sample of it with every key commented out.
+The configuration. The package installs it with every key commented out.
 
 ## EXAMPLES
 A server that other hosts reach, for the users of the file of users alone:

@@ -25,7 +25,7 @@ using Clock = std::chrono::steady_clock;
 using Kind = JsonValue::Kind;
 
 constexpr const char* kNotThere =
-    "zorva-bmc does not answer, and it is who changes the service processor; 'systemctl status zorva-bmc' says why";
+    "zorva-bmc, which changes the service processor, does not answer; 'systemctl status zorva-bmc' says why";
 
 JsonValue listOf(const StringList& texts) {
   JsonValue list = JsonValue::list();
