@@ -29,7 +29,7 @@ using ::testing::Not;
 class RunningBmc : util::NotCopied {
  public:
   explicit RunningBmc(const testing::TestRedfish& redfish, const std::string& config)
-      : log_(redfish.directory() / "log"), socket_(socketBeside(redfish.bmcJson())) {
+      : log_(redfish.directory() / "log"), socket_(agent::bmcSocketBeside(redfish.bmcJson())) {
     process_ = ::fork();
     if (process_ == 0) {
       ::dup2(::open(log_.c_str(), O_CREAT | O_WRONLY | O_TRUNC, 0600), STDERR_FILENO);

@@ -4,6 +4,7 @@
 #include <array>
 #include <cstdio>
 
+#include "util/Text.h"
 #include "util/Utf8.h"
 
 namespace zorva::bmc {
@@ -89,15 +90,9 @@ Login askForAccount(Ipmi& ipmi) {
 
 std::string askForFingerprint(Ipmi& ipmi) {
   constexpr std::size_t kSize = 32;
-  constexpr std::string_view kDigits = "0123456789abcdef";
   const auto fields = askGroup(ipmi, kGetFingerprint, kFirstCertificate, 1 + kSize, "certificate fingerprint");
   if (fields->text().front() != kSha256) throw NotOffered("the certificate's fingerprint over IPMI is no SHA-256");
-  std::string text;
-  for (const char byte : fields->text().substr(1)) {
-    const auto value = static_cast<unsigned char>(byte);
-    text += {kDigits[value / 16], kDigits[value % 16]};
-  }
-  return text;
+  return util::hexOf(std::string_view(fields->text()).substr(1));
 }
 
 void BootstrapAccount::prepare() {

@@ -2,6 +2,8 @@
 
 #include <algorithm>
 
+#include "util/Text.h"
+
 namespace zorva::bmc {
 
 namespace {
@@ -12,12 +14,6 @@ constexpr const char* kServers = "StaticNameServers";
 constexpr const char* kFqdn = "FQDN";
 constexpr const char* kUseServers = "UseDNSServers";
 constexpr const char* kUseDomain = "UseDomainName";
-
-JsonValue listOf(const StringList& texts) {
-  JsonValue list = JsonValue::list();
-  for (const std::string& text : texts) list.add(JsonValue::ofText(text));
-  return list;
-}
 
 StringList textsOf(const JsonValue& list) {
   StringList texts;
@@ -41,7 +37,7 @@ void addUnlessEmpty(JsonValue& object, const char* name, JsonValue member) {
 
 /// A list as long as the one that the service has, with its padding.
 JsonValue padded(const StringList& servers, const Ethernet& now) {
-  JsonValue list = listOf(servers);
+  JsonValue list = JsonValue::ofTexts(servers);
   const std::size_t length = now.staticServers ? now.staticServers->size() : 0;
   while (list.items.size() < length) list.add(now.padsWithNull ? JsonValue() : JsonValue::ofText({}));
   return list;
@@ -49,12 +45,6 @@ JsonValue padded(const StringList& servers, const Ethernet& now) {
 
 bool differs(const std::optional<bool>& now, const JsonValue* wanted) {
   return wanted != nullptr && now && *now != wanted->boolean;
-}
-
-std::string joined(const StringList& words) {
-  std::string text;
-  for (const std::string& word : words) text += (text.empty() ? "" : ", ") + word;
-  return text;
 }
 
 }  // namespace
@@ -66,7 +56,7 @@ JsonValue propertiesFor(const Ethernet& now, const WantedDns& wanted) {
     if (!now.staticServers) {
       throw Failed("interface " + now.id + " has no StaticNameServers: its DNS servers cannot be set by Redfish");
     }
-    properties.add(kServers, listOf(withoutPadding(*wanted.servers)));
+    properties.add(kServers, JsonValue::ofTexts(withoutPadding(*wanted.servers)));
   }
   const bool setsDomain = wanted.domain && *wanted.domain != now.domain();
   if (setsDomain) {
@@ -87,7 +77,7 @@ JsonValue propertiesFor(const Ethernet& now, const WantedDns& wanted) {
 
 JsonValue propertiesOf(const Ethernet& now) {
   JsonValue properties = JsonValue::object();
-  if (now.staticServers) properties.add(kServers, listOf(withoutPadding(*now.staticServers)));
+  if (now.staticServers) properties.add(kServers, JsonValue::ofTexts(withoutPadding(*now.staticServers)));
   if (now.fqdn) properties.add(kFqdn, JsonValue::ofText(*now.fqdn));
   for (const DhcpOf& family : kFamilies) {
     const Dhcp& dhcp = now.*family.dhcp;
@@ -131,7 +121,8 @@ std::string warningBefore(const Ethernet& now, const WantedDns& wanted) {
     std::erase_if(dropped,
                   [&](const std::string& each) { return std::find(kept.begin(), kept.end(), each) != kept.end(); });
   }
-  if (!dropped.empty()) warning = "the service processor will no longer use what DHCP gave it: " + joined(dropped);
+  if (!dropped.empty())
+    warning = "the service processor will no longer use what DHCP gave it: " + util::joined(dropped);
   const bool dropsDomain =
       wanted.domain && *wanted.domain != now.domain() && (now.v4.givesDomain() || now.v6.givesDomain());
   if (dropsDomain) {

@@ -22,12 +22,6 @@ using Kind = JsonValue::Kind;
 
 constexpr std::size_t kMostAddresses = 64;
 
-/// A text that can be shown, else the empty one.
-std::string textIn(const JsonValue& value, std::string_view name) {
-  const JsonValue* text = memberOf(value, name, Kind::Text);
-  return text != nullptr && agent::isShownText(text->text) ? text->text : std::string();
-}
-
 std::optional<bool> booleanIn(const JsonValue& value, std::string_view name) {
   const JsonValue* boolean = memberOf(value, name, Kind::Boolean);
   return boolean == nullptr ? std::nullopt : std::optional(boolean->boolean);
@@ -71,14 +65,10 @@ std::optional<unsigned int> prefixOf(const std::string& mask) {
   return bits;
 }
 
-bool isUnspecified(const std::vector<unsigned char>& address) {
-  return std::all_of(address.begin(), address.end(), [](unsigned char byte) { return byte == 0; });
-}
-
 std::optional<unsigned int> prefixLengthIn(const JsonValue& item, std::size_t bytes) {
   constexpr std::size_t kBitsOfByte = 8;
   constexpr std::size_t kIPv4Bytes = 4;
-  if (bytes == kIPv4Bytes) return prefixOf(textIn(item, "SubnetMask"));
+  if (bytes == kIPv4Bytes) return prefixOf(shownTextIn(item, "SubnetMask"));
   const JsonValue* length = memberOf(item, "PrefixLength", Kind::Number);
   if (length == nullptr || length->number > bytes * kBitsOfByte) return std::nullopt;
   return static_cast<unsigned int>(length->number);
@@ -90,23 +80,17 @@ void addAddresses(const JsonValue& body, std::string_view name, agent::AddressLi
   if (list == nullptr) return;
   for (const JsonValue& item : list->items) {
     if (addresses.size() == kMostAddresses) return;
-    const std::vector<unsigned char> bytes = agent::bytesOfAddress(textIn(item, "Address"));
+    const std::vector<unsigned char> bytes = agent::bytesOfAddress(shownTextIn(item, "Address"));
     const std::optional<unsigned int> length = prefixLengthIn(item, bytes.size());
-    if (bytes.empty() || isUnspecified(bytes) || !length) continue;
+    if (bytes.empty() || agent::isUnspecifiedAddress(bytes) || !length) continue;
     InterfaceAddress address{agent::textOfAddress(bytes), *length, AddressOrigin::Unknown};
-    const std::string origin = textIn(item, "AddressOrigin");
+    const std::string origin = shownTextIn(item, "AddressOrigin");
     for (const OriginName& known : kOrigins) {
       if (known.name == origin) address.origin = known.origin;
     }
     const auto isSame = [&](const InterfaceAddress& other) { return other.address == address.address; };
     if (std::none_of(addresses.begin(), addresses.end(), isSame)) addresses.push_back(address);
   }
-}
-
-std::string lastName(const std::string& path) {
-  const std::size_t end = path.find_last_not_of('/') + 1;
-  const std::size_t begin = path.rfind('/', end - 1) + 1;
-  return path.substr(begin, end - begin);
 }
 
 bool isNodeName(const std::string& name) { return !name.empty() && name.find('/') == std::string::npos; }
@@ -165,7 +149,7 @@ StringList withoutPadding(const StringList& servers) {
   for (const std::string& server : servers) {
     const std::string address = server.substr(0, server.find('%'));
     const std::vector<unsigned char> bytes = agent::bytesOfAddress(address);
-    if (bytes.empty() || isUnspecified(bytes)) continue;
+    if (bytes.empty() || agent::isUnspecifiedAddress(bytes)) continue;
     const std::string usual = agent::textOfAddress(bytes);
     if (std::find(list.begin(), list.end(), usual) == list.end()) list.push_back(usual);
   }
@@ -199,11 +183,11 @@ std::string Ethernet::domain() const {
 Ethernet readEthernet(const JsonValue& body) {
   Ethernet ethernet;
   ethernet.resource = idOf(body);
-  ethernet.id = textIn(body, "Id");
-  if (!isNodeName(ethernet.id)) ethernet.id = lastName(ethernet.resource);
-  ethernet.name = textIn(body, "Name");
-  ethernet.hostName = textIn(body, "HostName");
-  if (const std::string fqdn = textIn(body, "FQDN"); !fqdn.empty()) ethernet.fqdn = fqdn;
+  ethernet.id = shownTextIn(body, "Id");
+  if (!isNodeName(ethernet.id)) ethernet.id = lastNameOf(ethernet.resource);
+  ethernet.name = shownTextIn(body, "Name");
+  ethernet.hostName = shownTextIn(body, "HostName");
+  if (const std::string fqdn = shownTextIn(body, "FQDN"); !fqdn.empty()) ethernet.fqdn = fqdn;
   ethernet.nameServers = textsIn(body, "NameServers");
   ethernet.staticServers = textsIn(body, "StaticNameServers");
   if (const JsonValue* list = memberOf(body, "StaticNameServers", Kind::List)) {
@@ -214,13 +198,13 @@ Ethernet readEthernet(const JsonValue& body) {
     ethernet.v4 = {booleanIn(*v4, "DHCPEnabled"), booleanIn(*v4, "UseDNSServers"), booleanIn(*v4, "UseDomainName")};
   }
   if (const JsonValue* v6 = memberOf(body, "DHCPv6", Kind::Object)) {
-    const std::string mode = textIn(*v6, "OperatingMode");
+    const std::string mode = shownTextIn(*v6, "OperatingMode");
     ethernet.v6 = {mode.empty() ? std::nullopt : std::optional(mode != "Disabled"), booleanIn(*v6, "UseDNSServers"),
                    booleanIn(*v6, "UseDomainName")};
   }
   ethernet.enabled = booleanIn(body, "InterfaceEnabled");
-  ethernet.linkStatus = textIn(body, "LinkStatus");
-  if (const JsonValue* status = memberOf(body, "Status", Kind::Object)) ethernet.state = textIn(*status, "State");
+  ethernet.linkStatus = shownTextIn(body, "LinkStatus");
+  if (const JsonValue* status = memberOf(body, "Status", Kind::Object)) ethernet.state = shownTextIn(*status, "State");
   addAddresses(body, "IPv4Addresses", ethernet.addresses);
   addAddresses(body, "IPv6Addresses", ethernet.addresses);
   const JsonValue* later = memberOf(body, "@Redfish.Settings", Kind::Object);

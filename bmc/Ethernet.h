@@ -58,7 +58,6 @@ StringList withoutPadding(const StringList& servers);
 
 struct Manager {
   std::string id;
-  std::string description;
   std::vector<Ethernet> interfaces;
 };
 

@@ -40,9 +40,8 @@ std::optional<std::string> urlIn(std::string_view record) {
   if (format != kIPv4 && format != kIPv6) return std::nullopt;
   const std::string_view field = record.substr(kAddress, format == kIPv4 ? 4 : 16);
   const std::vector<unsigned char> address(field.begin(), field.end());
-  const bool isUnspecified = std::all_of(address.begin(), address.end(), [](unsigned char byte) { return byte == 0; });
   const int port = byteAt(record, kPort) + byteAt(record, kPort + 1) * 256;
-  if (isUnspecified || port == 0) return std::nullopt;
+  if (agent::isUnspecifiedAddress(address) || port == 0) return std::nullopt;
   const std::string text = agent::textOfAddress(address);
   return "https://" + (format == kIPv4 ? text : "[" + text + "]") + ":" + std::to_string(port);
 }

@@ -59,7 +59,7 @@ inline constexpr std::size_t kLargestHead = std::size_t{64} << 10;
 /// thread.
 class Https : util::NotCopied {
  public:
-  /// The URL has neither path nor login. `interface` is the network interface that requests leave through; empty: any.
+  /// The URL has neither path nor login.
   Https(std::string url, Trust trust);
   ~Https();
 

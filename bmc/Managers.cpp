@@ -1,24 +1,15 @@
 #include "bmc/Managers.h"
 
-#include "agent/sources/DnsFacts.h"
-
 namespace zorva::bmc {
 
 namespace {
 
 using Kind = JsonValue::Kind;
 
-std::string shownText(const JsonValue& body, const char* name) {
-  const JsonValue* text = memberOf(body, name, Kind::Text);
-  return text != nullptr && agent::isShownText(text->text) ? text->text : std::string();
-}
-
 std::string idOfManager(const JsonValue& body) {
-  std::string id = shownText(body, "Id");
+  const std::string id = shownTextIn(body, "Id");
   if (!id.empty() && id.find('/') == std::string::npos) return id;
-  id = idOf(body);
-  id.erase(id.find_last_not_of('/') + 1);
-  return id.substr(id.rfind('/') + 1);
+  return lastNameOf(idOf(body));
 }
 
 }  // namespace
@@ -31,7 +22,7 @@ std::vector<Manager> readManagers(Redfish& redfish, std::string& remark) {
   for (const JsonValue& body : redfish.members(idOf(*collection), kMostManagers, cut)) {
     const JsonValue* interfaces = memberOf(body, "EthernetInterfaces", Kind::Object);
     if (interfaces == nullptr) continue;
-    Manager manager{idOfManager(body), shownText(body, "Name"), {}};
+    Manager manager{idOfManager(body), {}};
     for (const JsonValue& each : redfish.members(idOf(*interfaces), kMostInterfaces, cut)) {
       manager.interfaces.push_back(readEthernet(each));
     }

@@ -5,6 +5,7 @@
 #include <thread>
 
 #include "agent/config/Config.h"
+#include "agent/sources/DnsFacts.h"
 #include "util/Escape.h"
 
 namespace zorva::bmc {
@@ -93,6 +94,17 @@ std::string messagesIn(const JsonValue& body) {
   return line;
 }
 
+std::string shownTextIn(const JsonValue& value, std::string_view name) {
+  const JsonValue* text = memberOf(value, name, Kind::Text);
+  return text != nullptr && agent::isShownText(text->text) ? text->text : std::string();
+}
+
+std::string lastNameOf(const std::string& path) {
+  const std::size_t end = path.find_last_not_of('/') + 1;
+  const std::size_t begin = path.rfind('/', end - 1) + 1;
+  return path.substr(begin, end - begin);
+}
+
 std::string idOf(const JsonValue& reference) {
   std::string id = textIn(reference, "@odata.id");
   if (!isPath(id)) throw Failed("the service processor names a resource that is none: '" + shortLine(id) + "'");
@@ -150,10 +162,11 @@ Reply Redfish::sendOnce(const Request& request, bool needsLogin) {
   if (requestsLeft_-- <= 0) {
     throw Failed(https_.url() + " needs more than " + std::to_string(kMostRequests) + " requests");
   }
+  if (!needsLogin) return https_.send(request);
   Request whole = request;
-  if (needsLogin) whole.fields.push_back("X-Auth-Token: " + token_);
+  whole.fields.push_back("X-Auth-Token: " + token_);
   Reply reply = https_.send(whole);
-  if (needsLogin) util::Secret::wipe(whole.fields.back());
+  util::Secret::wipe(whole.fields.back());
   return reply;
 }
 

@@ -42,6 +42,12 @@ std::string messagesIn(const JsonValue& body);
 /// The member of that name if it is of that kind; else null.
 const JsonValue* memberOf(const JsonValue& value, std::string_view name, JsonValue::Kind kind);
 
+/// The text of that name, if it can be shown on a line; else the empty one.
+std::string shownTextIn(const JsonValue& value, std::string_view name);
+
+/// The last name of a path: "1" of "/redfish/v1/Managers/1/".
+std::string lastNameOf(const std::string& path);
+
 /// The @odata.id of a reference, or of a resource itself. Throws Failed if it is no path below /redfish/v1.
 std::string idOf(const JsonValue& reference);
 

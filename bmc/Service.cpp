@@ -111,8 +111,6 @@ WantedDns wantedIn(const JsonValue& request) {
 
 }  // namespace
 
-std::string socketBeside(const std::string& file) { return directoryOf(file) + "bmc.sock"; }
-
 LoginSource loginFromFile(const std::string& user, const std::string& passwordFile) {
   return [user, passwordFile](const util::Secret*) {
     constexpr std::size_t kLongest = 4096;
@@ -190,7 +188,7 @@ void Service::publish() {
 }
 
 void Service::openSocket() {
-  const std::string path = socketBeside(config_.file);
+  const std::string path = agent::bmcSocketBeside(config_.file);
   sockaddr_un address{};
   address.sun_family = AF_UNIX;
   if (path.size() >= sizeof address.sun_path) throw Failed(path + ": is too long for a socket");
@@ -211,7 +209,7 @@ void Service::run() {
     readOnce();
     waitUntil(Clock::now() + std::chrono::seconds(config_.interval));
   }
-  ::unlink(socketBeside(config_.file).c_str());
+  ::unlink(agent::bmcSocketBeside(config_.file).c_str());
 }
 
 /// Serves the agent until then. A signal ends the wait at once.

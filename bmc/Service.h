@@ -76,9 +76,6 @@ class Service : util::NotCopied {
   util::FileDescriptor socket_;
 };
 
-/// The socket beside that file.
-std::string socketBeside(const std::string& file);
-
 /// A login with the configuration's user and password file. Throws Failed when it is used and the file is not there, is
 /// empty, or may be read by others.
 LoginSource loginFromFile(const std::string& user, const std::string& passwordFile);

@@ -6,6 +6,7 @@
 #include <utility>
 
 #include "schema/Schema.h"
+#include "util/Text.h"
 
 namespace zorva::cimom {
 
@@ -22,12 +23,7 @@ std::string newContext() {
     const ssize_t got = getrandom(bytes + filled, sizeof bytes - filled, 0);
     if (got > 0) filled += static_cast<std::size_t>(got);
   }
-  std::string name;
-  for (const unsigned char byte : bytes) {
-    name += "0123456789abcdef"[byte >> 4U];
-    name += "0123456789abcdef"[byte & 15U];
-  }
-  return name;
+  return util::hexOf({reinterpret_cast<const char*>(bytes), sizeof bytes});
 }
 
 }  // namespace

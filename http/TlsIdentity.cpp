@@ -8,6 +8,7 @@
 #include <utility>
 
 #include "util/ReadFile.h"
+#include "util/Text.h"
 
 namespace zorva::http {
 
@@ -66,13 +67,7 @@ std::string fingerprintOf(const X509Certificate& certificate) {
   unsigned char hash[kBytes];
   std::size_t size = sizeof hash;
   if (gnutls_x509_crt_get_fingerprint(certificate.get(), GNUTLS_DIG_SHA256, hash, &size) != 0) return {};
-  std::string text;
-  for (const unsigned char byte : hash) {
-    char digits[3];
-    std::snprintf(digits, sizeof digits, "%02x", static_cast<unsigned int>(byte));
-    text += digits;
-  }
-  return text;
+  return util::hexOf({reinterpret_cast<const char*>(hash), size});
 }
 
 std::shared_ptr<const TlsIdentity> TlsIdentity::load(const TlsFiles& files) {

@@ -87,12 +87,6 @@ class StateReader {
   std::string document_;
 };
 
-JsonValue listOf(const StringList& texts) {
-  JsonValue list = JsonValue::list();
-  for (const std::string& text : texts) list.add(JsonValue::ofText(text));
-  return list;
-}
-
 JsonValue listOf(const std::vector<SavedDns>& all) {
   JsonValue list = JsonValue::list();
   for (const SavedDns& saved : all) {
@@ -101,8 +95,8 @@ JsonValue listOf(const std::vector<SavedDns>& all) {
     item.add("owner", JsonValue::ofText(saved.owner));
     item.add("profile", JsonValue::ofText(saved.profile));
     item.add("saved", JsonValue::ofText(saved.saved));
-    item.add("servers", listOf(saved.shown.lists.servers));
-    item.add("suffixes", listOf(saved.shown.lists.suffixes));
+    item.add("servers", JsonValue::ofTexts(saved.shown.lists.servers));
+    item.add("suffixes", JsonValue::ofTexts(saved.shown.lists.suffixes));
     item.add("domain", JsonValue::ofText(saved.shown.domain));
     list.add(std::move(item));
   }

@@ -14,6 +14,7 @@
 #include "util/Escape.h"
 #include "util/FileError.h"
 #include "util/Names.h"
+#include "util/Text.h"
 
 namespace zorva::agent {
 namespace {
@@ -56,12 +57,6 @@ std::vector<PropertyChange> differences(const ShownDns& before, const ShownDns& 
   compare(PROP_DNS_SUFFIXES, before.lists.suffixes, after.lists.suffixes);
   compare(PROP_DOMAIN_NAME, listOfText(before.domain), listOfText(after.domain));
   return changes;
-}
-
-std::string joined(const StringList& words, const char* between = ", ") {
-  std::string text;
-  for (const std::string& word : words) text += (text.empty() ? "" : between) + word;
-  return text;
 }
 
 std::string inOneLine(const std::string& text) {
@@ -252,8 +247,9 @@ void Applier::refuseSharedStores(std::vector<Plan>& plans) const {
     if (others.empty()) continue;
     plan.result.problem = owner == kResolvConfOwner
                               ? owner + " is that of the whole host, and " + plan.interface.name +
-                                    " has other settings than " + joined(others) + "; apply one of them by its name"
-                              : plan.result.profile + " is the file of " + joined(others) + " too; give " +
+                                    " has other settings than " + util::joined(others) +
+                                    "; apply one of them by its name"
+                              : plan.result.profile + " is the file of " + util::joined(others) + " too; give " +
                                     plan.interface.name + " a file of its own in /etc/systemd/network";
   }
 }
@@ -320,8 +316,8 @@ std::string Applier::notTaken(const Plan& plan) {
   std::string problem = plan.result.owner + " did not take";
   for (const PropertyChange& change : differences(shown, wanted)) {
     problem += (problem.ends_with(')') ? ", " : " ") + change.property + " (it has " +
-               (change.before.empty() ? "none" : joined(change.before)) + ", not " +
-               (change.after.empty() ? "none" : joined(change.after)) + ")";
+               (change.before.empty() ? "none" : util::joined(change.before)) + ", not " +
+               (change.after.empty() ? "none" : util::joined(change.after)) + ")";
   }
   return problem + "; see what else sets it there, and apply again";
 }

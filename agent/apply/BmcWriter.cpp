@@ -4,16 +4,16 @@
 
 #include <poll.h>
 #include <sys/socket.h>
-#include <sys/un.h>
 
 #include <algorithm>
 #include <array>
 #include <cerrno>
 #include <chrono>
-#include <cstring>
 #include <utility>
 
 #include "agent/apply/Writers.h"
+#include "agent/sources/SystemBus.h"
+#include "agent/tree/BmcJson.h"
 #include "agent/tree/Json.h"
 #include "util/Escape.h"
 #include "util/FileDescriptor.h"
@@ -25,23 +25,7 @@ using Clock = std::chrono::steady_clock;
 using Kind = JsonValue::Kind;
 
 constexpr const char* kNotThere =
-    "zorva-bmc, which changes the service processor, does not answer; 'systemctl status zorva-bmc' says why";
-
-JsonValue listOf(const StringList& texts) {
-  JsonValue list = JsonValue::list();
-  for (const std::string& text : texts) list.add(JsonValue::ofText(text));
-  return list;
-}
-
-util::FileDescriptor connectTo(const std::string& path) {
-  sockaddr_un address{};
-  address.sun_family = AF_UNIX;
-  if (path.size() >= sizeof address.sun_path) return {};
-  std::memcpy(address.sun_path, path.c_str(), path.size() + 1);
-  util::FileDescriptor socket(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0));
-  if (::connect(socket.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address) != 0) return {};
-  return socket;
-}
+    "zorva-bmc does not answer, so the service processor cannot be changed; 'systemctl status zorva-bmc' says why";
 
 bool sendAll(int socket, std::string_view text) {
   while (!text.empty()) {
@@ -62,10 +46,13 @@ std::string receiveAll(int socket) {
   while (text.size() <= kLargest) {
     const auto left = std::chrono::ceil<std::chrono::milliseconds>(end - Clock::now()).count();
     pollfd entry{socket, POLLIN, 0};
-    if (left <= 0 || ::poll(&entry, 1, static_cast<int>(left)) <= 0) return {};
+    if (left <= 0) return {};
+    const int ready = ::poll(&entry, 1, static_cast<int>(left));
+    if (ready < 0 && errno == EINTR) continue;
+    if (ready <= 0) return {};
     const ssize_t got = ::recv(socket, buffer.data(), buffer.size(), 0);
     if (got == 0) return text;
-    if (got < 0 && errno != EINTR) return {};
+    if (got < 0 && errno != EINTR && errno != EAGAIN) return {};
     if (got > 0) text.append(buffer.data(), static_cast<std::size_t>(got));
   }
   return {};
@@ -73,7 +60,7 @@ std::string receiveAll(int socket) {
 
 class BmcWriter : public DnsWriter {
  public:
-  explicit BmcWriter(const std::string& bmcFile) : socket_(bmcFile.substr(0, bmcFile.rfind('/') + 1) + "bmc.sock") {}
+  explicit BmcWriter(const std::string& bmcFile) : socket_(bmcSocketBeside(bmcFile)) {}
 
   // It appends its domain and nothing else.
   DnsSettings asHeld(const DnsSettings& settings) const override {
@@ -123,7 +110,7 @@ class BmcWriter : public DnsWriter {
   }
 
   static void addSettings(JsonValue& request, const DnsSettings& settings) {
-    request.add("servers", listOf(settings.servers));
+    request.add("servers", JsonValue::ofTexts(settings.servers));
     request.add("domain", JsonValue::ofText(settings.suffixes.empty() ? std::string() : settings.suffixes.front()));
   }
 
@@ -136,7 +123,7 @@ class BmcWriter : public DnsWriter {
   }
 
   Expected<JsonValue, Refusal> ask(const JsonValue& request) const {
-    const util::FileDescriptor socket = connectTo(socket_);
+    const util::FileDescriptor socket = connectToSocket(socket_);
     if (!socket || !sendAll(socket.get(), formatJson(request))) return unexpected(std::string(kNotThere));
     try {
       JsonValue answer = parseJson(receiveAll(socket.get()), "the answer of zorva-bmc");

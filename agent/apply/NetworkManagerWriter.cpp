@@ -93,8 +93,8 @@ StringList routingOnly(const StringList& domains, const StringList& suffixes) {
 
 JsonValue jsonOf(const ProfileDns& dns) {
   JsonValue value = JsonValue::object();
-  value.add("servers", jsonList(dns.servers));
-  value.add("searches", jsonList(dns.searches));
+  value.add("servers", JsonValue::ofTexts(dns.servers));
+  value.add("searches", JsonValue::ofTexts(dns.searches));
   value.add("ignores_learned", JsonValue::ofNumber(dns.ignoresLearned ? 1 : 0));
   return value;
 }

@@ -209,7 +209,7 @@ Expected<std::string, Refusal> ResolvedWriter::save(const DnsTarget& target) {
   for (const Domain& domain : dns->domains) domains.push_back((domain.routingOnly ? "~" : "") + domain.name);
   JsonValue state = JsonValue::object();
   state.add("servers", std::move(servers));
-  state.add("domains", jsonList(domains));
+  state.add("domains", JsonValue::ofTexts(domains));
   return formatJson(state);
 }
 

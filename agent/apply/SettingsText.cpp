@@ -59,12 +59,6 @@ Expected<JsonValue, std::string> stateIn(const std::string& saved) {
   }
 }
 
-JsonValue jsonList(const StringList& texts) {
-  JsonValue list = JsonValue::list();
-  for (const std::string& text : texts) list.add(JsonValue::ofText(text));
-  return list;
-}
-
 StringList textsIn(const JsonValue& object, const std::string& name) {
   StringList texts;
   if (const JsonValue* list = object.find(name); list != nullptr) {

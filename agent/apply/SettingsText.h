@@ -30,8 +30,7 @@ void addOnce(StringList& list, const std::string& value);
 /// What DnsWriter::save() has returned, or why that cannot be read.
 Expected<JsonValue, std::string> stateIn(const std::string& saved);
 
-/// A list of texts in JSON, and back: the member of that name, empty where there is none.
-JsonValue jsonList(const StringList& texts);
+/// The member of that name; empty, or 0, where there is none.
 StringList textsIn(const JsonValue& object, const std::string& name);
 std::string textIn(const JsonValue& object, const std::string& name);
 std::uint64_t numberIn(const JsonValue& object, const std::string& name);

@@ -51,7 +51,7 @@ bool isMulticast(const std::vector<unsigned char>& address) {
 
 bool isUnspecified(const std::vector<unsigned char>& address) {
   if (address.size() == kIPv4Size) return address.front() == 0;
-  return std::all_of(address.begin(), address.end(), [](unsigned char byte) { return byte == 0; });
+  return isUnspecifiedAddress(address);
 }
 
 // An IPv4 address in an IPv6 address is judged as what it is.

@@ -60,6 +60,8 @@ void requireServiceProcessors(const TreeSnapshot& tree, const std::string& name)
 
 }  // namespace
 
+std::string bmcSocketBeside(const std::string& file) { return file.substr(0, file.rfind('/') + 1) + "bmc.sock"; }
+
 std::string formatBmcState(const BmcState& state) {
   JsonValue document = JsonValue::object();
   document.add("read_at", JsonValue::ofNumber(state.readAt));

@@ -27,6 +27,9 @@ struct BmcState {
 /// The name of a service processor's node begins with it, so that no node of the host has the same.
 inline constexpr const char* kBmcNodePrefix = "bmc.";
 
+/// The socket beside the file, at which zorva-bmc takes changes.
+std::string bmcSocketBeside(const std::string& file);
+
 /// The limits of the file, in bytes and in interfaces.
 inline constexpr std::size_t kLargestBmcJson = std::size_t{4} << 20;
 inline constexpr std::size_t kMostBmcInterfaces = 1024;

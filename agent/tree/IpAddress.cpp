@@ -41,6 +41,10 @@ std::vector<unsigned char> bytesOfAddress(const std::string& text) {
   return parse(AF_INET, text, bytes) ? bytes : std::vector<unsigned char>();
 }
 
+bool isUnspecifiedAddress(const std::vector<unsigned char>& address) {
+  return std::all_of(address.begin(), address.end(), [](unsigned char byte) { return byte == 0; });
+}
+
 unsigned int protocolTypeOf(const AddressList& addresses) {
   constexpr unsigned int kOther = 1;
   constexpr unsigned int kIPv4 = 4096;

@@ -21,6 +21,9 @@ bool isIPv6LinkLocal(const std::string& text);
 std::string textOfAddress(const std::vector<unsigned char>& address);
 std::vector<unsigned char> bytesOfAddress(const std::string& text);
 
+// Whether it is 0.0.0.0 or ::, which no host has.
+bool isUnspecifiedAddress(const std::vector<unsigned char>& address);
+
 // CIM's ProtocolIFType: 4096 IPv4, 4097 IPv6, 4098 both, 1 if there are none.
 unsigned int protocolTypeOf(const AddressList& addresses);
 

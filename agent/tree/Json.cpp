@@ -257,6 +257,12 @@ JsonValue JsonValue::ofBoolean(bool boolean) {
   return value;
 }
 
+JsonValue JsonValue::ofTexts(const std::vector<std::string>& texts) {
+  JsonValue value = list();
+  for (const std::string& text : texts) value.add(ofText(text));
+  return value;
+}
+
 JsonValue JsonValue::list() {
   JsonValue value;
   value.kind = Kind::List;

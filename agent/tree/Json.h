@@ -29,6 +29,7 @@ struct JsonValue {
   static JsonValue ofText(std::string text);
   static JsonValue ofNumber(std::uint64_t number);
   static JsonValue ofBoolean(bool boolean);
+  static JsonValue ofTexts(const std::vector<std::string>& texts);
   static JsonValue list();
   static JsonValue object();
 

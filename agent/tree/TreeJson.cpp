@@ -314,9 +314,7 @@ JsonValue propertyToJson(const PropertyValue& value) {
   if (const auto* number = std::get_if<unsigned int>(&value)) return JsonValue::ofNumber(*number);
   if (const auto* text = std::get_if<std::string>(&value)) return JsonValue::ofText(*text);
   if (const auto* addresses = std::get_if<SharedAddresses>(&value)) return addressesToJson(**addresses);
-  JsonValue list = JsonValue::list();
-  for (const std::string& text : *std::get<SharedStrings>(value)) list.add(JsonValue::ofText(text));
-  return list;
+  return JsonValue::ofTexts(*std::get<SharedStrings>(value));
 }
 
 JsonValue treeToJsonValue(const TreeSnapshot& tree) {

@@ -68,16 +68,6 @@ std::string fieldOf(const curl_slist* fields, std::string_view name) {
   return {};
 }
 
-std::string hexOf(const Digest& digest) {
-  constexpr const char* kDigits = "0123456789abcdef";
-  std::string text;
-  for (const unsigned char byte : digest) {
-    text += kDigits[byte >> 4U];
-    text += kDigits[byte & 15U];
-  }
-  return text;
-}
-
 }  // namespace
 
 std::optional<ServerCertificate> certificateOf(const Curl& curl) {
@@ -92,8 +82,8 @@ std::optional<ServerCertificate> certificateOf(const Curl& curl) {
     throw Failure(ExitCode::Failed, "the fingerprint of the server's certificate cannot be made with this libcurl",
                   "--ca FILE needs none");
   }
-  return ServerCertificate{hexOf(*digest), fieldOf(own, "Subject"), fieldOf(own, "Start date"),
-                           fieldOf(own, "Expire date")};
+  return ServerCertificate{util::hexOf({reinterpret_cast<const char*>(digest->data()), digest->size()}),
+                           fieldOf(own, "Subject"), fieldOf(own, "Start date"), fieldOf(own, "Expire date")};
 }
 
 std::string describe(const ServerCertificate& certificate) {

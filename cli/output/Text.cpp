@@ -161,15 +161,6 @@ std::string asUtf8(std::string_view text) {
   return out;
 }
 
-std::string joined(const std::vector<std::string>& texts, std::string_view separator) {
-  std::string out;
-  for (const std::string& text : texts) {
-    if (&text != &texts.front()) out += separator;
-    out += text;
-  }
-  return out;
-}
-
 std::string nearestOr(std::string_view word, const std::vector<std::string>& known, const std::string& otherwise) {
   const std::string question = util::didYouMean(word, known);
   return question.empty() ? otherwise : printable(question);

@@ -8,6 +8,8 @@
 #include <string_view>
 #include <vector>
 
+#include "util/Text.h"
+
 namespace zorva::cli {
 
 /// `text` with unprintable characters made visible: \n, \t, \x1B for control characters and for bytes that are not
@@ -33,8 +35,7 @@ std::string firstOf(const std::vector<std::string>& texts, std::size_t width);
 /// agent's own documents.
 std::string asUtf8(std::string_view text);
 
-/// The texts with `separator` between them.
-std::string joined(const std::vector<std::string>& texts, std::string_view separator);
+using util::joined;
 
 /// What to do about a word that is none of the known ones: "did you mean eth0?" if one of them is near, else this.
 std::string nearestOr(std::string_view word, const std::vector<std::string>& known, const std::string& otherwise);
