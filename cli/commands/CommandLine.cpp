@@ -134,7 +134,7 @@ std::chrono::milliseconds durationOf(const std::string& word) {
 void addServerOptions(CLI::App& app, ServerOptions& servers, const std::vector<CLI::Option*>& replaced) {
   CLI::Option* url = addTexts(app, "--url",
                               "Ask this CIM server, and not the providers: https://USER@HOST:PORT/NAMESPACE, "
-                              "http://HOST, or unix: for the socket of this host's; may be repeated",
+                              "http://HOST, or unix: for this host's socket; may be repeated",
                               servers.urls)
                          ->type_name("URL")
                          ->allow_extra_args(false);

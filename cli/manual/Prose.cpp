@@ -225,8 +225,9 @@ The file, where `data_dir` of `agent.toml`(5) is not set.
 )";
 
 constexpr std::string_view kDns = R"(
-Shows or changes the DNS servers of an interface. It is made of the CIM operations: the interface needs a file of settings,
-which `zorvactl ifcfg init` makes. An address that is given twice, a multicast and the unspecified address are refused.
+Shows or changes the DNS servers of an interface. It changes `ZORVA_DNSSettingData` as a CIM client would, so the
+interface needs a file of settings, which `zorvactl ifcfg init` makes. An address that is given twice, a multicast address and the
+unspecified address are refused.
 
 ## SEE ALSO
 `zorvactl-ifcfg`(1), `zorvactl-apply`(1)
