@@ -1,6 +1,5 @@
 #include "bmc/HostInterface.h"
 
-#include <algorithm>
 #include <cstdint>
 #include <vector>
 

@@ -7,7 +7,7 @@ namespace {
 using Kind = JsonValue::Kind;
 
 std::string idOfManager(const JsonValue& body) {
-  const std::string id = shownTextIn(body, "Id");
+  std::string id = shownTextIn(body, "Id");
   if (!id.empty() && id.find('/') == std::string::npos) return id;
   return lastNameOf(idOf(body));
 }
