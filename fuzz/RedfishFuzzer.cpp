@@ -15,7 +15,7 @@ using namespace zorva;  // NOLINT(google-build-using-namespace)
 
 void checkState(const bmc::Ethernet& ethernet) {
   agent::BmcState state;
-  state.tree = bmc::treeOf({{"1", "", {ethernet, ethernet}}});
+  state.tree = bmc::treeOf({{"1", {ethernet, ethernet}}});
   const std::string text = formatBmcState(state);
   if (formatBmcState(agent::parseBmcState(text, "again")) == text) return;
   std::fprintf(stderr, "the state changes when it is read back:\n%s\n", text.c_str());
