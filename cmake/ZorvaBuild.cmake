@@ -113,7 +113,7 @@ function(zorva_precompile_headers)
   endif()
 endfunction()
 
-# Tests report where they failed, so their debug information is only file and line for a stack trace; local variables
+# Tests report where they failed, so their debug information is at most file and line for a stack trace; local variables
 # would cost a sixth of their compilation. Position-independent like the libraries, because a precompiled header serves
 # only one kind of code.
 set(ZORVA_TEST_DEBUG_INFO "-g1" CACHE STRING "Debug information of the tests; -g to step through one in a debugger")

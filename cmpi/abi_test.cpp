@@ -14,6 +14,7 @@
 #include <cstdint>
 #include <set>
 #include <string>
+#include <string_view>
 #include <type_traits>
 #include <vector>
 
@@ -42,6 +43,10 @@ std::string withoutBlanks(std::string text) {
 
 // ---- Records, types, constants ----
 
+// One comparison each, and no macro of the test framework: there are thousands, and those macros take long to compile.
+void expectTrue(bool isTrue, const char* name) { EXPECT_TRUE(isTrue) << name; }
+void expectEqual(long long actual, long long expected, const char* name) { EXPECT_EQ(actual, expected) << name; }
+
 template <typename Type>
 constexpr bool isFunctionPointer = std::is_pointer_v<Type>&& std::is_function_v<std::remove_pointer_t<Type>>;
 
@@ -49,18 +54,18 @@ TEST(CMPI_ABI_SUITE, EveryRecordIsLaidOutAsTheStandardSays) {
   int records = 0;
   int fields = 0;
   int functions = 0;
-#define RECORD(name, tagged, kind, bytes, alignment)                        \
-  ++records;                                                                \
-  EXPECT_TRUE((std::is_same_v<name, tagged>)) << #name;                     \
-  EXPECT_EQ(std::is_union_v<name>, std::string(#kind) == "union") << #name; \
-  EXPECT_EQ(sizeof(name), std::size_t{bytes}) << #name;                     \
-  EXPECT_EQ(alignof(name), std::size_t{alignment}) << #name;
-#define FIELD(record, field, at, bytes, ...)                                   \
-  ++fields;                                                                    \
-  functions += isFunctionPointer<decltype(record::field)> ? 1 : 0;             \
-  EXPECT_EQ(offsetof(record, field), std::size_t{at}) << #record "::" #field;  \
-  EXPECT_EQ(sizeof(record::field), std::size_t{bytes}) << #record "::" #field; \
-  EXPECT_TRUE((std::is_same_v<decltype(record::field), __VA_ARGS__>)) << #record "::" #field;
+#define RECORD(name, tagged, kind, bytes, alignment)                             \
+  ++records;                                                                     \
+  expectTrue(std::is_same_v<name, tagged>, #name);                               \
+  expectEqual(std::is_union_v<name>, std::string_view(#kind) == "union", #name); \
+  expectEqual(sizeof(name), bytes, #name);                                       \
+  expectEqual(alignof(name), alignment, #name);
+#define FIELD(record, field, at, bytes, ...)                       \
+  ++fields;                                                        \
+  functions += isFunctionPointer<decltype(record::field)> ? 1 : 0; \
+  expectEqual(offsetof(record, field), at, #record "::" #field);   \
+  expectEqual(sizeof(record::field), bytes, #record "::" #field);  \
+  expectTrue(std::is_same_v<decltype(record::field), __VA_ARGS__>, #record "::" #field);
 #include "abi_records.inc"
 #undef RECORD
 #undef FIELD
@@ -76,14 +81,14 @@ TEST(CMPI_ABI_SUITE, EveryRecordIsLaidOutAsTheStandardSays) {
 
 TEST(CMPI_ABI_SUITE, EveryTypedefNamesTheTypeOfTheStandard) {
   int typedefs = 0;
-#define TYPEDEF(name, bytes, alignment, ...)                 \
-  ++typedefs;                                                \
-  EXPECT_TRUE((std::is_same_v<name, __VA_ARGS__>)) << #name; \
-  EXPECT_EQ(sizeof(name), std::size_t{bytes}) << #name;      \
-  EXPECT_EQ(alignof(name), std::size_t{alignment}) << #name;
+#define TYPEDEF(name, bytes, alignment, ...)            \
+  ++typedefs;                                           \
+  expectTrue(std::is_same_v<name, __VA_ARGS__>, #name); \
+  expectEqual(sizeof(name), bytes, #name);              \
+  expectEqual(alignof(name), alignment, #name);
 #define TYPEDEF_WITHOUT_SIZE(name, ...) \
   ++typedefs;                           \
-  EXPECT_TRUE((std::is_same_v<name, __VA_ARGS__>)) << #name;
+  expectTrue(std::is_same_v<name, __VA_ARGS__>, #name);
 #include "abi_typedefs.inc"
 #undef TYPEDEF
 #undef TYPEDEF_WITHOUT_SIZE
@@ -97,14 +102,14 @@ TEST(CMPI_ABI_SUITE, EveryTypedefNamesTheTypeOfTheStandard) {
 TEST(CMPI_ABI_SUITE, EveryEnumeratorHasTheValueOfTheStandard) {
   int enums = 0;
   int values = 0;
-#define ENUM(name, tagged, bytes)                       \
-  ++enums;                                              \
-  EXPECT_TRUE((std::is_same_v<name, tagged>)) << #name; \
-  EXPECT_EQ(sizeof(name), std::size_t{bytes}) << #name;
-#define ENUMERATOR(type, name, number)                          \
-  ++values;                                                     \
-  EXPECT_TRUE((std::is_same_v<decltype(name), type>)) << #name; \
-  EXPECT_EQ(static_cast<long>(name), long{number}) << #name;
+#define ENUM(name, tagged, bytes)                  \
+  ++enums;                                         \
+  expectTrue(std::is_same_v<name, tagged>, #name); \
+  expectEqual(sizeof(name), bytes, #name);
+#define ENUMERATOR(type, name, number)                     \
+  ++values;                                                \
+  expectTrue(std::is_same_v<decltype(name), type>, #name); \
+  expectEqual(name, number, #name);
 #include "abi_enums.inc"
 #undef ENUM
 #undef ENUMERATOR
@@ -321,17 +326,26 @@ struct Fake<CMPIBroker> {
   CMPIBroker object{};
 };
 
+void expectAnswerOf(bool isOfTheSlotsType, std::uint64_t got, std::uint64_t given) {
+  EXPECT_TRUE(isOfTheSlotsType) << "the macro's type is not that of the slot";
+  EXPECT_EQ(got, given) << "the slot's answer got lost";
+}
+
+void expectOneCall(const void* slot, const Words& words) {
+  ASSERT_EQ(calls().size(), 1u);
+  EXPECT_EQ(calls().front().slot, slot) << "another slot was called";
+  EXPECT_EQ(calls().front().words, words);
+}
+
 template <auto Member, typename Type>
 void expectAnswer(Type got) {
-  EXPECT_TRUE((std::is_same_v<Type, typename Slot<Member>::Answer>)) << "the macro's type is not that of the slot";
-  EXPECT_EQ(word(got), word(argument<typename Slot<Member>::Answer>(kAnswer))) << "the slot's answer got lost";
+  using Answer = typename Slot<Member>::Answer;
+  expectAnswerOf(std::is_same_v<Type, Answer>, word(got), word(argument<Answer>(kAnswer)));
 }
 
 template <auto Member>
 void expectCall(const Words& words) {
-  ASSERT_EQ(calls().size(), 1u);
-  EXPECT_EQ(calls().front().slot, &Slot<Member>::id) << "another slot was called";
-  EXPECT_EQ(calls().front().words, words);
+  expectOneCall(&Slot<Member>::id, words);
 }
 
 // Macros take a pointer to any variable that holds a value; the inline functions have the type of the slot.
