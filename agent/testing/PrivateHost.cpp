@@ -106,6 +106,8 @@ void writeConfiguration() {
   writeFile("/etc/NetworkManager/NetworkManager.conf",
             "[main]\nplugins=keyfile\nauth-polkit=false\nno-auto-default=*\ndhcp=internal\n");
   writeFile("/etc/systemd/resolved.conf", "[Resolve]\nFallbackDNS=\n");
+  // DHCP clients make their identifier of it, and a new machine has none before systemd ran on it.
+  writeFile("/etc/machine-id", "0123456789abcdef0123456789abcdef\n");
   for (const char* folder : {"links", "leases", "lldp"}) {
     fs::create_directories(std::string("/run/systemd/netif/") + folder);
   }

@@ -31,6 +31,7 @@ TEST(PrivateHost, RunsTheRealDaemons) {
     EXPECT_NE(outputOf("resolvectl status").find("(eth0)"), std::string::npos);
     EXPECT_NE(outputOf("networkctl list --no-pager").find("eth0"), std::string::npos);
     EXPECT_NE(outputOf("nmcli device").find("eth0"), std::string::npos);
+    EXPECT_EQ(contentsOf("/etc/machine-id"), "0123456789abcdef0123456789abcdef\n");
     return true;
   }));
 }

@@ -308,6 +308,10 @@ std::string modify(const std::string& server) {
   return outputOf(std::string(kZorvactl).substr(0, std::string(kZorvactl).find(' ')) +
                   " --url http://127.0.0.1:5988 dns set eth0 " + server + "; echo \"[$?]\"");
 }
+constexpr const char* kAsNobody = "setpriv --reuid=nobody --clear-groups --inh-caps=-all ";
+bool nobodyCanRunTheServer() {
+  return outputOf(std::string(kAsNobody) + ZORVA_BIN_DIR "/zorvacimd --version; echo \"[$?]\"").ends_with("[0]\n");
+}
 bool serverListens() { return outputOf("ss -Hltn 'sport = :5988'; true").find("5988") != std::string::npos; }
 
 bool theServerAppliesBeforeItAnswers() {
@@ -330,8 +334,7 @@ bool theServerNeedsNoRootForIt() {
   writeFile("/run/zorvacimd.toml", "");
   outputOf("chown nobody /var/lib/zorvagent");
   EXPECT_THAT(run("ifcfg init eth0"), EndsWith("[0]\n"));
-  outputOf("setpriv --reuid=nobody --clear-groups --inh-caps=-all " + std::string(kServer) +
-           ">/run/log/zorvacimd 2>&1 &");
+  outputOf(std::string(kAsNobody) + kServer + ">/run/log/zorvacimd 2>&1 &");
   EXPECT_TRUE(becomesTrue(serverListens)) << contentsOf("/run/log/zorvacimd");
   outputOf("(while sleep 0.3; do " + std::string(kZorvactl) +
            "apply --all --automatic; done) >/run/log/applier 2>&1 &");
@@ -376,7 +379,10 @@ TEST_F(ApplyToHost, IsDoneByTheServerBeforeItAnswers) {
   EXPECT_TRUE(succeedsOnPrivateHost(theServerAppliesBeforeItAnswers));
 }
 
-TEST_F(ApplyToHost, NeedsNoRootInTheServer) { EXPECT_TRUE(succeedsOnPrivateHost(theServerNeedsNoRootForIt)); }
+TEST_F(ApplyToHost, NeedsNoRootInTheServer) {
+  if (!nobodyCanRunTheServer()) GTEST_SKIP() << "another user cannot run what was built here";
+  EXPECT_TRUE(succeedsOnPrivateHost(theServerNeedsNoRootForIt));
+}
 
 }  // namespace
 }  // namespace zorva::cli
