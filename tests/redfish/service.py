@@ -3,8 +3,8 @@
 
   service.py CERTIFICATE KEY [SCHEMA-FOLDER]
 
-Prints its port. Each line of standard input is a JSON object of switches (see SWITCHES), or of a command, and is answered
-with one line:
+It begins with the resources of world.json and prints its port. Each line of standard input is a JSON object of switches
+(see SWITCHES), or of a command, and is answered with one line:
   {"patch": 204}                         sets switches
   {"set": {"PATH": {"FQDN": null}}}      changes a resource; null removes a property
   {"log": true}                          the requests since the last time
@@ -13,6 +13,7 @@ with one line:
                                          which of them they refuse
 It ends with its standard input.
 """
+import collections
 import copy
 import http.server
 import json
@@ -25,10 +26,15 @@ import warnings
 
 USER, PASSWORD = "operator", "correct horse"
 ROOT = "/redfish/v1"
+SESSIONS = f"{ROOT}/SessionService/Sessions"
+INTERFACES = f"{ROOT}/Managers/1/EthernetInterfaces"
 SWITCHES = {
-    "etag": "strong",    # "strong", "weak" or "absent"
+    "etag": "strong",    # "strong", "weak", "body" (@odata.etag alone) or "absent"
     "expand": True,      # $expand is offered
     "patch": 204,        # 200, 202, 204; 400 with ExtendedInfo; 503 or 412 once; 429
+    "repeats": False,    # 412 and 503 come every time
+    "late": 0,           # seconds until a change is in use
+    "restart": 0,        # seconds after a change in which nothing is answered
     "task": "Completed", # the end of a task after a 202; "Exception" fails
     "login": 201,        # 401 refuses everybody
     "account": [USER, PASSWORD],  # the one that may log in; others' sessions end when it changes
@@ -40,47 +46,10 @@ SWITCHES = {
 }
 
 
-def collection(kind, path, members):
-    return {"@odata.type": f"#{kind}Collection.{kind}Collection", "@odata.id": path, "Name": f"{kind} Collection",
-            "Members@odata.count": len(members), "Members": [{"@odata.id": each} for each in members]}
-
-
-def interface(manager, name, address, **more):
-    path = f"{ROOT}/Managers/{manager}/EthernetInterfaces/{name}"
-    body = {"@odata.type": "#EthernetInterface.v1_6_0.EthernetInterface", "@odata.id": path, "Id": name,
-            "Name": f"Network interface {name}", "Status": {"State": "Enabled", "Health": "OK"},
-            "InterfaceEnabled": True, "LinkStatus": "LinkUp", "HostName": "host1-bmc",
-            "FQDN": "host1-bmc.mgmt.example.org", "NameServers": ["192.0.2.53", "2001:db8::53"],
-            "StaticNameServers": ["192.0.2.53", "2001:db8::53", "", ""],
-            "DHCPv4": {"DHCPEnabled": False, "UseDNSServers": False, "UseDomainName": False},
-            "DHCPv6": {"OperatingMode": "Disabled", "UseDNSServers": False, "UseDomainName": False},
-            "IPv4Addresses": [{"Address": address, "SubnetMask": "255.255.255.0", "AddressOrigin": "Static"}],
-            "IPv6Addresses": [{"Address": "fe80::1", "PrefixLength": 64, "AddressOrigin": "LinkLocal",
-                               "AddressState": "Preferred"}]}
-    body.update(more)
-    return body
-
-
 def first_world():
-    world = {
-        f"{ROOT}/": {
-            "@odata.type": "#ServiceRoot.v1_20_0.ServiceRoot", "@odata.id": f"{ROOT}/", "Id": "RootService",
-            "Name": "Root Service", "RedfishVersion": "1.15.0", "Managers": {"@odata.id": f"{ROOT}/Managers"},
-            "SessionService": {"@odata.id": f"{ROOT}/SessionService"},
-            "Links": {"Sessions": {"@odata.id": f"{ROOT}/SessionService/Sessions"}}},
-        f"{ROOT}/Managers": collection("Manager", f"{ROOT}/Managers", [f"{ROOT}/Managers/1"]),
-    }
-    for manager, names in {"1": ["eth0", "usb0"]}.items():
-        path = f"{ROOT}/Managers/{manager}"
-        world[path] = {
-            "@odata.type": "#Manager.v1_24_0.Manager", "@odata.id": path, "Id": manager, "Name": "Manager",
-            "ManagerType": "BMC", "EthernetInterfaces": {"@odata.id": f"{path}/EthernetInterfaces"}}
-        ports = [f"{path}/EthernetInterfaces/{name}" for name in names]
-        world[f"{path}/EthernetInterfaces"] = collection("EthernetInterface", f"{path}/EthernetInterfaces", ports)
-    for body in (interface("1", "eth0", "192.0.2.20"),
-                 interface("1", "usb0", "169.254.0.17", LinkStatus="LinkDown", NameServers=[], StaticNameServers=[])):
-        world[body["@odata.id"]] = body
-    return world
+    """The resources of world.json, each with its path. They have what service processors answer, most of which is not read."""
+    text = pathlib.Path(__file__).with_name("world.json").read_text(encoding="utf-8")
+    return {path: {"@odata.id": path, **body} for path, body in json.loads(text).items()}
 
 
 class Schemas:
@@ -98,11 +67,11 @@ class Schemas:
             self.jsonschema = None
 
     def load(self, uri):
-        """A schema by its name; where the folder has another version only, that one."""
+        """A schema by its name; where the folder has another version only, that one; else one that allows everything."""
         name = uri.split("#")[0].rsplit("/", 1)[-1]
         files = [self.folder / name, *sorted(self.folder.glob(name.split(".")[0] + ".v*.json"), reverse=True)]
         file = next((each for each in files if each.is_file()), None)
-        return json.loads(file.read_text(encoding="utf-8")) if file else {}
+        return json.loads(file.read_text(encoding="utf-8")) if file else {"definitions": collections.defaultdict(dict)}
 
     def check(self, path, body):
         if self.jsonschema is None:
@@ -131,6 +100,7 @@ class Service:
         self.made = 0
         self.task_polls = 0
         self.once = None
+        self.away_until = 0
         self.schemas = schemas
         self.dhcp_servers = ["198.51.100.1"]
 
@@ -166,20 +136,25 @@ class Service:
         text = f'"v{self.versions.get(path, 1)}"'
         return "W/" + text if self.switches["etag"] == "weak" else text
 
+    def etag_field(self, path):
+        return None if self.switches["etag"] == "body" else self.etag(path)
+
     def get(self, path, query):
         body = copy.deepcopy(self.world.get(path) or self.world.get(path.rstrip("/")))
         if body is None:
             return None
+        if self.switches["etag"] == "body":
+            body["@odata.etag"] = self.etag(path)
         if path == f"{ROOT}/":
-            offered = self.switches["expand"]
-            body["ProtocolFeaturesSupported"] = {
-                "ExpandQuery": {"ExpandAll": False, "Levels": False, "Links": False, "NoLinks": offered}}
+            body["ProtocolFeaturesSupported"]["ExpandQuery"]["NoLinks"] = self.switches["expand"]
         elif query.startswith("$expand") and "Members" in body:
             body["Members"] = [self.get(each["@odata.id"], "") or each for each in body["Members"]]
         return body
 
     def change(self, path, body):
-        """What a service does with a PATCH: lists keep their length, what is in use follows."""
+        """What a service does with a PATCH: what is in use follows. The settings object of an interface is applied at once."""
+        if path.endswith("/SD"):
+            self.change(path.removesuffix("/SD"), body)
         now = self.world[path]
         for name, value in body.items():
             if isinstance(value, dict):
@@ -192,6 +167,18 @@ class Service:
         if "StaticNameServers" in now:
             now["NameServers"] = learned + slots if self.switches["uses_both"] or not slots else slots
         self.versions[path] = self.versions.get(path, 1) + 1
+
+    def change_later(self, path, body):
+        with self.lock:
+            self.change(path, body)
+
+    def take(self, path, body):
+        """Makes a change at once, or as the switches say. The lock is held."""
+        self.away_until = time.monotonic() + self.switches["restart"]
+        if self.switches["late"]:
+            threading.Timer(self.switches["late"], self.change_later, [path, body]).start()
+        else:
+            self.change(path, body)
 
 
 def error(message, resolution="None."):
@@ -296,15 +283,13 @@ class Handler(http.server.BaseHTTPRequestHandler):
             self.answer(200, json.dumps(body).encode())
         elif wrong in ("cycle", "many"):
             page = int(self.path.rsplit("skip=", 1)[-1]) if "skip=" in self.path else 0
-            body = self.service.get(f"{ROOT}/Managers/1/EthernetInterfaces", "")
+            body = self.service.get(INTERFACES, "")
             if wrong == "cycle":
                 body["Members"] *= 3
-                body["Members@odata.nextLink"] = f"{ROOT}/Managers/1/EthernetInterfaces?skip=1"
+                body["Members@odata.nextLink"] = f"{INTERFACES}?skip=1"
             else:
-                base = f"{ROOT}/Managers/1/EthernetInterfaces"
-                one = self.service.get(f"{base}/eth0", "")
-                body["Members"] = [dict(one, **{"@odata.id": f"{base}/x{page}-{i}", "Id": "same"}) for i in range(3000)]
-                body["Members@odata.nextLink"] = f"{base}?skip={page + 1}"
+                body["Members"] = [{"@odata.id": f"{INTERFACES}/x{page}-{i}", "Id": "same"} for i in range(3000)]
+                body["Members@odata.nextLink"] = f"{INTERFACES}?skip={page + 1}"
             self.answer(200, json.dumps(body).encode())
         else:
             return False
@@ -315,16 +300,19 @@ class Handler(http.server.BaseHTTPRequestHandler):
             self.record()
         path, _, query = self.path.partition("?")
         service = self.service
+        if time.monotonic() < service.away_until:
+            self.close_connection = True
+            return None
         if path.rstrip("/") != ROOT:
             with service.lock:
                 known = self.is_known()
             if not known or self.goes_wrong():
-                return
+                return None
         if path.startswith(f"{ROOT}/TaskService/"):
             return self.answer_task()
         with service.lock:
             body = service.get(path, query)
-            etag = service.etag(path)
+            etag = service.etag_field(path)
         if body is None:
             return self.answer(404, error("The resource was not found."))
         if etag and not query and self.headers.get("If-None-Match") == etag:
@@ -356,10 +344,11 @@ class Handler(http.server.BaseHTTPRequestHandler):
                 return self.answer(401, error("The login is wrong."))
             service.made += 1
             token = f"token-{service.made}"
-            path = f"{ROOT}/SessionService/Sessions/{service.made}"
+            path = f"{SESSIONS}/{service.made}"
             service.sessions[token] = [path, 0]
-        self.answer(201, {"@odata.type": "#Session.v1_8_0.Session", "@odata.id": path, "Id": str(service.made),
-                          "Name": "User Session", "UserName": body["UserName"]}, X_Auth_Token=token, Location=path)
+            session = {**service.world[f"{SESSIONS}/0"], "@odata.id": path, "Id": str(service.made),
+                       "UserName": body["UserName"]}
+        self.answer(201, session, X_Auth_Token=token, Location=path)
 
     def do_DELETE(self):
         with self.service.lock:
@@ -378,7 +367,7 @@ class Handler(http.server.BaseHTTPRequestHandler):
                 return
             mode, status = service.once, service.switches["patch"]
             if mode in (412, 503):
-                service.once = 204
+                service.once = mode if service.switches["repeats"] else 204
                 status = mode
             elif status in (412, 503):
                 status = 204
@@ -394,11 +383,11 @@ class Handler(http.server.BaseHTTPRequestHandler):
                                                  "Send another value."))
             service.task_polls = 0
             if status != 202 or service.switches["task"] == "Completed":
-                service.change(self.path, body)
+                service.take(self.path, body)
             now = service.get(self.path, "")
         if status == 202:
             return self.answer(202, None, Location=f"{ROOT}/TaskService/TaskMonitors/1")
-        return self.answer(status, now if status == 200 else None, ETag=service.etag(self.path))
+        return self.answer(status, now if status == 200 else None, ETag=service.etag_field(self.path))
 
 
 class Server(http.server.ThreadingHTTPServer):
