@@ -20,10 +20,12 @@ namespace {
 using agent::testing::contentsOf;
 using http::testing::outputOf;
 using ::testing::AllOf;
+using ::testing::ElementsAre;
 using ::testing::HasSubstr;
 using testing::json;
 using testing::kEth0;
 using ::testing::Not;
+using ::testing::Pair;
 
 /// zorva-bmc as a process, its standard error in a file.
 class RunningBmc : util::NotCopied {
@@ -76,6 +78,19 @@ class ApplyTest : public ::testing::Test {
     return outputOf(ZORVA_BIN_DIR "/zorvactl --config " + config_ + " " + words);
   }
 
+  // The same as a user who is in the group of the files and not root.
+  std::string zorvactlOfAUser(const std::string& words) const {
+    return outputOf("setpriv --reuid=nobody --clear-groups --inh-caps=-all " ZORVA_BIN_DIR "/zorvactl --config " +
+                    config_ + " " + words);
+  }
+
+  // The requests by which a command has changed something: each with its ETag, and the properties.
+  std::vector<std::pair<std::string, json>> changes() {
+    std::vector<std::pair<std::string, json>> found;
+    for (const json& each : redfish_.patches()) found.emplace_back(each["If-Match"], each["body"]);
+    return found;
+  }
+
   json interfaceShown() const {
     const json view = json::parse(zorvactl("show zvbmc0 --output json"));
     return view["interfaces"][0];
@@ -96,12 +111,39 @@ TEST_F(ApplyTest, AChangeReachesTheServiceProcessorAndIsTakenBack) {
                                                         HasSubstr("domain_name"), Not(HasSubstr("applied by"))));
   EXPECT_EQ(redfish_.tell({{"get", kEth0}})["StaticNameServers"][0], "192.0.2.53") << "a dry run changes nothing";
   EXPECT_THAT(zorvactl("apply zvbmc0"), HasSubstr("applied by BMC"));
-  EXPECT_EQ(redfish_.tell({{"get", kEth0}})["StaticNameServers"], json::parse(R"(["192.0.2.77", "", "", ""])"));
-  EXPECT_EQ(redfish_.tell({{"get", kEth0}})["FQDN"], "host1-bmc.lab.example.org");
+  EXPECT_THAT(changes(), ElementsAre(Pair("\"v2\"", json::parse(R"({"StaticNameServers": ["192.0.2.77", "", "", ""],
+                                                                    "FQDN": "host1-bmc.lab.example.org"})"))));
   EXPECT_THAT(zorvactl("apply 'BMC%zvbmc0'"), HasSubstr("the host has these settings already"));
   EXPECT_THAT(zorvactl("revert zvbmc0"), HasSubstr("reverted by BMC"));
-  EXPECT_EQ(redfish_.tell({{"get", kEth0}})["NameServers"], json::parse(R"(["192.0.2.53", "2001:db8::53"])"));
-  EXPECT_EQ(redfish_.tell({{"get", kEth0}})["FQDN"], "host1-bmc.mgmt.example.org");
+  EXPECT_THAT(changes(),
+              ElementsAre(Pair("\"v3\"", json::parse(R"({"StaticNameServers": ["192.0.2.53", "2001:db8::53", "", ""],
+                                                        "FQDN": "host1-bmc.mgmt.example.org"})"))));
+}
+
+TEST_F(ApplyTest, ADryRunNamesTheServersOfDhcpThatWillBeDropped) {
+  redfish_.tell({{"set",
+                  {{kEth0,
+                    {{"StaticNameServers", {"", ""}},
+                     {"NameServers", {"198.51.100.1"}},
+                     {"DHCPv4", {{"DHCPEnabled", true}, {"UseDNSServers", true}}}}}}}});
+  RunningBmc bmc(redfish_, config_);
+  zorvactl("ifcfg init zvbmc0");
+  zorvactl("dns set zvbmc0 192.0.2.77");
+  const std::string warning = "the service processor will no longer use what DHCP gave it: 198.51.100.1";
+  EXPECT_THAT(zorvactl("apply zvbmc0 --dry-run"), HasSubstr(warning));
+  EXPECT_THAT(changes(), ElementsAre());
+}
+
+TEST_F(ApplyTest, AUserSeesWhatWouldChangeAndChangesNothing) {
+  if (::geteuid() != 0) GTEST_SKIP() << "only root can be another user";
+  RunningBmc bmc(redfish_, config_);
+  zorvactl("ifcfg init zvbmc0");
+  zorvactl("dns set zvbmc0 192.0.2.77");
+  for (const char* place : {"", "run", "data"}) ::chmod((redfish_.directory() / place).c_str(), 0755);
+  EXPECT_THAT(zorvactlOfAUser("apply zvbmc0 --dry-run"),
+              AllOf(HasSubstr("192.0.2.53 2001:db8::53  ->  192.0.2.77"), HasSubstr("only root may ask zorva-bmc"),
+                    Not(HasSubstr("does not answer"))));
+  EXPECT_THAT(changes(), ElementsAre());
 }
 
 TEST_F(ApplyTest, WithApplyHostTheCommandItselfChangesIt) {
@@ -110,7 +152,10 @@ TEST_F(ApplyTest, WithApplyHostTheCommandItselfChangesIt) {
   RunningBmc bmc(redfish_, config_);
   zorvactl("ifcfg init zvbmc0");
   EXPECT_THAT(zorvactl("dns set zvbmc0 192.0.2.78"), HasSubstr("applied by BMC"));
-  EXPECT_EQ(redfish_.tell({{"get", kEth0}})["NameServers"], json::parse(R"(["192.0.2.78"])"));
+  zorvactl("domain zvbmc0 lab.example.org");
+  EXPECT_THAT(changes(),
+              ElementsAre(Pair("\"v2\"", json::parse(R"({"StaticNameServers": ["192.0.2.78", "", "", ""]})")),
+                          Pair("\"v3\"", json::parse(R"({"FQDN": "host1-bmc.lab.example.org"})"))));
   redfish_.tell({{"patch", 400}});
   EXPECT_THAT(zorvactl("dns set zvbmc0 192.0.2.79"), HasSubstr("The value 192.0.2.1 of StaticNameServers is refused."));
 }

@@ -131,8 +131,7 @@ std::string warningBefore(const Ethernet& now, const WantedDns& wanted) {
   return warning;
 }
 
-std::string change(Redfish& redfish, const std::string& resource,
-                   const std::function<JsonValue(const Ethernet& now)>& propertiesOn) {
+std::string change(Redfish& redfish, const std::string& resource, const PropertiesOn& propertiesOn) {
   constexpr int kMostAttempts = 2;
   for (int attempt = 0; attempt < kMostAttempts; ++attempt) {
     const Resource found = redfish.fetch(resource);

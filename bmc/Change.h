@@ -31,9 +31,11 @@ JsonValue differenceFrom(const Ethernet& now, const JsonValue& properties);
 /// What a person should know before the change; empty for nothing.
 std::string warningBefore(const Ethernet& now, const WantedDns& wanted);
 
+/// The properties to be sent, by what the interface has now; an empty object: none.
+using PropertiesOn = std::function<JsonValue(const Ethernet& now)>;
+
 /// Makes the change that `propertiesOn` names for the interface as it is now. If somebody else changes it at the same
 /// time, it is read again and the change is tried once more. Returns the service's remarks. Throws Failed.
-std::string change(Redfish& redfish, const std::string& resource,
-                   const std::function<JsonValue(const Ethernet& now)>& propertiesOn);
+std::string change(Redfish& redfish, const std::string& resource, const PropertiesOn& propertiesOn);
 
 }  // namespace zorva::bmc

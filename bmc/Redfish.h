@@ -58,6 +58,7 @@ class Redfish : util::NotCopied {
 
   /// Allows kMostRequests requests from now until the deadline.
   void begin(Clock::time_point deadline);
+  Clock::time_point deadline() const { return deadline_; }
 
   /// The service root, which needs no login. Read once after each failure.
   const JsonValue& root();

@@ -15,7 +15,7 @@
 #include <system_error>
 
 #include "agent/sources/DnsFacts.h"
-#include "bmc/Change.h"
+#include "bmc/Ethernet.h"
 #include "bmc/Managers.h"
 #include "util/Escape.h"
 #include "util/FileError.h"
@@ -260,22 +260,20 @@ JsonValue Service::perform(const JsonValue& request) {
   }
   if (name == "write") {
     const auto properties = [&](const Ethernet& now) { return propertiesFor(now, wanted); };
-    return oneMember("note", JsonValue::ofText(makeChange(resource, properties, wanted.servers)));
+    return oneMember("note", JsonValue::ofText(makeChange(resource, properties)));
   }
   const JsonValue* saved = memberOf(request, "properties", Kind::Object);
   if (name != "restore" || saved == nullptr) throw Failed("the request is not understood");
-  const auto properties = [saved](const Ethernet&) { return *saved; };
-  return oneMember("note", JsonValue::ofText(makeChange(resource, properties, std::nullopt)));
+  const auto properties = [saved](const Ethernet& now) { return differenceFrom(now, *saved); };
+  return oneMember("note", JsonValue::ofText(makeChange(resource, properties)));
 }
 
 /// Whatever comes of the change, the file has what the service says after it.
-std::string Service::makeChange(const std::string& resource,
-                                const std::function<JsonValue(const Ethernet&)>& propertiesOn,
-                                const std::optional<StringList>& servers) {
+std::string Service::makeChange(const std::string& resource, const PropertiesOn& propertiesOn) {
   std::string note;
   try {
     note = change(redfish_, resource, propertiesOn);
-    if (servers) awaitServers(resource, *servers);
+    awaitEffect(resource, propertiesOn);
   } catch (...) {
     readOnce();
     throw;
@@ -284,11 +282,18 @@ std::string Service::makeChange(const std::string& resource,
   return note;
 }
 
-/// A service may need some time until new servers are in use.
-void Service::awaitServers(const std::string& resource, const StringList& servers) {
+/// A service may need some time until what it took is in use. Some start their network anew and do not answer
+/// meanwhile.
+void Service::awaitEffect(const std::string& resource, const PropertiesOn& propertiesOn) {
   constexpr milliseconds kPause{500};
-  const auto end = Clock::now() + patience_.effect;
-  while (readEthernet(redfish_.fetch(resource).body).servers() != withoutPadding(servers) && Clock::now() < end) {
+  const auto end = std::min(Clock::now() + patience_.effect, redfish_.deadline());
+  for (;;) {
+    try {
+      if (propertiesOn(readEthernet(redfish_.fetch(resource).body)).items.empty()) return;
+    } catch (const Failed&) {
+      // The reading that follows reports it, if it lasts.
+    }
+    if (isStopped_ || Clock::now() + kPause >= end) return;
     redfish_.wait(kPause);
   }
 }

@@ -4,13 +4,11 @@
 
 #include <atomic>
 #include <chrono>
-#include <functional>
-#include <optional>
 #include <string>
 
 #include "agent/config/Config.h"
 #include "agent/tree/BmcJson.h"
-#include "bmc/Ethernet.h"
+#include "bmc/Change.h"
 #include "bmc/Https.h"
 #include "bmc/Redfish.h"
 #include "util/FileDescriptor.h"
@@ -21,7 +19,7 @@ namespace zorva::bmc {
 struct Patience {
   std::chrono::milliseconds reading{60000};
   std::chrono::milliseconds change{60000};
-  std::chrono::milliseconds effect{10000};  ///< until the service shows what was changed
+  std::chrono::milliseconds effect{30000};  ///< of that, until the service shows what was changed
 };
 
 /// Where and how the service is asked.
@@ -60,9 +58,8 @@ class Service : util::NotCopied {
   void serveOne();
   JsonValue perform(const JsonValue& request);
   std::string resourceIn(const JsonValue& request) const;
-  std::string makeChange(const std::string& resource, const std::function<JsonValue(const Ethernet&)>& propertiesOn,
-                         const std::optional<StringList>& servers);
-  void awaitServers(const std::string& resource, const StringList& servers);
+  std::string makeChange(const std::string& resource, const PropertiesOn& propertiesOn);
+  void awaitEffect(const std::string& resource, const PropertiesOn& propertiesOn);
   void waitUntil(Clock::time_point next);
 
   const agent::BmcConfig config_;

@@ -72,6 +72,14 @@ std::vector<std::string> TestRedfish::requests() {
   return lines;
 }
 
+json TestRedfish::patches() {
+  json found = json::array();
+  for (const json& each : tell({{"log", true}})) {
+    if (each["method"] == "PATCH") found.push_back(each);
+  }
+  return found;
+}
+
 void TestRedfish::changeCertificate() {
   files_ = authority_.issue("other", {"redfish", {kLoopback}});
   tell({{"certificate", files_.certificate}, {"key", files_.key}});

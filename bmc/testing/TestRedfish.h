@@ -32,6 +32,9 @@ class TestRedfish : util::NotCopied {
   /// The requests since the last time, as "GET /redfish/v1/", without the queries.
   std::vector<std::string> requests();
 
+  /// The PATCH requests among the requests since the last time: "method", "path", "If-Match" and "body".
+  json patches();
+
   /// From now on its certificate is another one of the same authority.
   void changeCertificate();
 
