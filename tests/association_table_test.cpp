@@ -5,9 +5,12 @@
 #include <gmock/gmock.h>
 #include <stdlib.h>
 
+#include <algorithm>
 #include <filesystem>
 #include <fstream>
+#include <map>
 #include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -47,7 +50,14 @@ struct Row {
   const char* left;
   const char* right;
   Lines associations;
+  // What Associators of the left ends and of the right ends show, where that is not the pairs above.
+  std::optional<Lines> fromLeft = {};
+  std::optional<Lines> fromRight = {};
 };
+
+const Lines kServersOfHost{"192.0.2.53 -> eth0",   "192.0.2.53 -> eth1",   "192.0.2.53 -> wlan0",
+                           "192.0.2.54 -> eth0",   "192.0.2.54 -> eth1",   "192.0.2.54 -> wlan0",
+                           "2001:db8::53 -> eth0", "2001:db8::53 -> eth1", "2001:db8::53 -> wlan0"};
 
 const Row kRows[] = {
     // The tree does not say which interface can reach which server, so all are paired.
@@ -67,18 +77,25 @@ const Row kRows[] = {
          "2001:db8::53 -> eth0 OrderOfAccess=2",
          "2001:db8::53 -> eth1 OrderOfAccess=2",
          "2001:db8::53 -> wlan0 OrderOfAccess=2",
-     }},
+     },
+     // Every server is the host's, and only endpoints of the same system are its far ends.
+     kServersOfHost,
+     kServersOfHost},
     // By the whole name: the further address eth0_2 has no endpoint of its own.
     {"ZORVA_DNSSAPSAPDependency", "Antecedent", "Dependent", {"eth0 -> eth0", "eth1 -> eth1", "bmc0 -> bmc0"}},
     {"ZORVA_DNSHostedAccessPoint",
      "Antecedent",
      "Dependent",
-     {"host1 -> eth0", "host1 -> eth1", "host1 -> wlan0", "BMC:-1 -> bmc0"}},
+     {"host1 -> eth0", "host1 -> eth1", "host1 -> wlan0", "BMC:-1 -> bmc0"},
+     // Only the host itself is asked for its endpoints.
+     Lines{"host1 -> eth0", "host1 -> eth1", "host1 -> wlan0"}},
     // The service processor's name is not in the setting's InstanceID.
     {"ZORVA_DNSGeneralElementSettingData",
      "ManagedElement",
      "SettingData",
-     {"host1 -> dnsgen1:host1 IsCurrent=1 IsDefault=1"}},
+     {"host1 -> dnsgen1:host1 IsCurrent=1 IsDefault=1"},
+     std::nullopt,
+     Lines{"host1 -> dnsgen1:host1", "BMC:-1 -> dnsgen1:host1"}},
     {"ZORVA_DNSGenEndPointElementSettingData",
      "ManagedElement",
      "SettingData",
@@ -103,14 +120,19 @@ const Row kRows[] = {
       "Computer%eth1%ipv4 -> Computer%eth1 AssignedSequence=2", "BMC%bmc0%ipv4 -> BMC%bmc0 AssignedSequence=2"}},
 };
 
-std::string nameOf(const broker::Value* end) {
-  if (end == nullptr || !std::holds_alternative<broker::Boxed<broker::ObjectPath>>(end->scalar)) return "?";
-  const broker::ObjectPath& path = *std::get<broker::Boxed<broker::ObjectPath>>(end->scalar);
+std::string nameOf(const broker::ObjectPath& path) {
   for (const char* key : {"InstanceID", "Name"}) {
     if (path.key(key) != nullptr) return std::string(path.key(key)->asText());
   }
   return "?";
 }
+
+const broker::ObjectPath* pathOf(const broker::Value* end) {
+  if (end == nullptr || !std::holds_alternative<broker::Boxed<broker::ObjectPath>>(end->scalar)) return nullptr;
+  return &*std::get<broker::Boxed<broker::ObjectPath>>(end->scalar);
+}
+
+std::string nameOf(const broker::Value* end) { return pathOf(end) == nullptr ? "?" : nameOf(*pathOf(end)); }
 
 class AssociationTable : public ::testing::TestWithParam<Row> {
  protected:
@@ -150,6 +172,32 @@ class AssociationTable : public ::testing::TestWithParam<Row> {
     Lines lines;
     for (const std::string& line : GetParam().associations) {
       lines.push_back(line.substr(0, line.find(' ', line.find(" -> ") + 4)));
+    }
+    return lines;
+  }
+
+  // The objects at that end, each once.
+  static std::vector<broker::ObjectPath> ends(const char* end) {
+    std::map<std::string, broker::ObjectPath> found;
+    broker_->enumerateInstanceNames("root/cimv2", GetParam().className, [&](const broker::ObjectPath& association) {
+      if (const broker::ObjectPath* path = pathOf(association.key(end))) found.emplace(nameOf(*path), *path);
+      return true;
+    });
+    std::vector<broker::ObjectPath> paths;
+    for (const auto& [name, path] : found) paths.push_back(path);
+    return paths;
+  }
+
+  // "left -> right" for each object at one end and what is associated with it.
+  static Lines associatedFrom(const char* from, const char* to) {
+    Lines lines;
+    for (const broker::ObjectPath& path : ends(from)) {
+      broker_->associatorNames(path, {GetParam().className, {}, from, to}, [&](const broker::ObjectPath& other) {
+        const std::string names[] = {nameOf(path), nameOf(other)};
+        const bool isLeft = from == GetParam().left;
+        lines.push_back(names[isLeft ? 0 : 1] + " -> " + names[isLeft ? 1 : 0]);
+        return true;
+      });
     }
     return lines;
   }
@@ -197,6 +245,12 @@ TEST_P(AssociationTable, EachIsFoundByItsName) {
     lines.push_back(lineOf(*association));
   }
   EXPECT_THAT(lines, UnorderedElementsAreArray(GetParam().associations));
+}
+
+TEST_P(AssociationTable, IsWhatAssociatorsOfBothEndsShow) {
+  const Row& row = GetParam();
+  EXPECT_THAT(associatedFrom(row.left, row.right), UnorderedElementsAreArray(row.fromLeft.value_or(pairs())));
+  EXPECT_THAT(associatedFrom(row.right, row.left), UnorderedElementsAreArray(row.fromRight.value_or(pairs())));
 }
 
 }  // namespace
