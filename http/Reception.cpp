@@ -1,6 +1,7 @@
 #include "http/Reception.h"
 
 #include <sys/epoll.h>
+#include <sys/ioctl.h>
 
 #include <array>
 #include <cerrno>
@@ -27,6 +28,29 @@ bool beginsRequest(unsigned char byte) {
 }
 
 bool isWrong(Door door, unsigned char byte) { return door == Door::Http ? byte == kTlsHandshake : beginsRequest(byte); }
+
+/// Type, version and length of a TLS record (RFC 8446 5.1).
+using RecordHead = std::array<unsigned char, 5>;
+constexpr std::size_t kLongestRecord = std::size_t{16} << 10;
+
+/// How many bytes the client has to send before its handshake can go on. 0: none; the TLS library has to look at them.
+std::size_t neededForHandshake(const RecordHead& head, std::size_t got) {
+  if (head[0] != kTlsHandshake) return 0;
+  if (got < head.size()) return head.size();
+  const std::size_t length = std::size_t{head[3]} << 8U | head[4];
+  return length <= kLongestRecord ? head.size() + length : 0;
+}
+
+bool hasBytes(int socket, std::size_t count) {
+  int there = 0;
+  return ::ioctl(socket, FIONREAD, &there) != 0 || static_cast<std::size_t>(there) >= count;
+}
+
+/// The socket counts as readable when so many bytes are there, or the client has ended.
+void wakeAt(int socket, std::size_t bytes) {
+  const int count = static_cast<int>(bytes);
+  ::setsockopt(socket, SOL_SOCKET, SO_RCVLOWAT, &count, sizeof count);
+}
 
 std::string localAddress(int socket) {
   sockaddr_storage local{};
@@ -81,6 +105,9 @@ void Reception::look() {
   for (int i = 0; i < count; ++i) {
     const auto found = waiting_.find(events.at(static_cast<std::size_t>(i)).data.fd);
     if (found == waiting_.end()) continue;
+    if ((events.at(static_cast<std::size_t>(i)).events & (EPOLLRDHUP | EPOLLHUP | EPOLLERR)) != 0) {
+      found->second.hasEnded = true;
+    }
     const Result result = lookAt(found->second);
     if (result == Result::Waits) continue;
     if (result == Result::Ended) end(found->second);
@@ -91,15 +118,28 @@ void Reception::look() {
 Reception::Result Reception::lookAt(Newcomer& newcomer) {
   if (newcomer.isAnswered) return drop(newcomer);
   const int descriptor = newcomer.socket.get();
-  unsigned char first = 0;
-  const ssize_t got = ::recv(descriptor, &first, 1, MSG_PEEK | MSG_DONTWAIT);
+  RecordHead head{};
+  const ssize_t got = ::recv(descriptor, head.data(), head.size(), MSG_PEEK | MSG_DONTWAIT);
   if (got < 0 && (errno == EAGAIN || errno == EWOULDBLOCK || errno == EINTR)) return Result::Waits;
   if (got <= 0) return Result::Ended;
-  if (isWrong(newcomer.door, first)) {
+  if (isWrong(newcomer.door, head[0])) {
     answer(newcomer);
     return drop(newcomer);
   }
+  const std::size_t needed = newcomer.door == Door::Https ? neededForHandshake(head, static_cast<std::size_t>(got)) : 0;
+  if (needed == 0 || hasBytes(descriptor, needed)) return admit(newcomer);
+  if (newcomer.hasEnded) return Result::Ended;
+  // Woken too early: the kernel has no room for more, so the bytes must be taken.
+  if (newcomer.awaited == needed) return admit(newcomer);
+  wakeAt(descriptor, needed);
+  newcomer.awaited = needed;
+  return Result::Waits;
+}
+
+Reception::Result Reception::admit(Newcomer& newcomer) {
+  const int descriptor = newcomer.socket.get();
   if (newcomer.isWatched) ::epoll_ctl(epoll_.get(), EPOLL_CTL_DEL, descriptor, nullptr);
+  wakeAt(descriptor, 1);
   admit_(std::move(newcomer));
   return Result::Admitted;
 }

@@ -1,11 +1,13 @@
 #pragma once
 
 // New connections, until their first byte shows whether the client speaks what the port speaks. A client that does not
-// gets a sentence. All functions are called on one thread, which never waits here; the table of connections limits how
-// many connections there are and for how long.
+// gets a sentence. A client of TLS stays here until the first record of its handshake is there as a whole: clients that
+// send it byte by byte wake no thread. All functions are called on one thread, which never waits here; the table of
+// connections limits how many connections there are and for how long.
 
 #include <sys/socket.h>
 
+#include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <memory>
@@ -28,6 +30,8 @@ struct Newcomer {
   Door door = Door::Http;
   std::shared_ptr<Connection> connection;
   bool isWatched = false;   ///< by Reception's epoll
+  bool hasEnded = false;    ///< the client sends nothing more
+  std::size_t awaited = 0;  ///< bytes of the handshake's first record, if it is awaited
   bool isAnswered = false;  ///< it spoke the wrong protocol, and has been told so
   std::size_t dropped = 0;  ///< bytes that it sent since
 };
@@ -43,7 +47,7 @@ class Reception : util::NotCopied {
   /// Readable when look() has something to do.
   int descriptor() const noexcept { return epoll_.get(); }
 
-  /// Admits the connection, at once if its first byte is there.
+  /// Admits the connection, at once if its first bytes are there.
   void add(Newcomer newcomer);
 
   /// Looks at the connections that have sent something or ended.
@@ -52,6 +56,7 @@ class Reception : util::NotCopied {
  private:
   enum class Result : std::uint8_t { Waits, Admitted, Ended };
   Result lookAt(Newcomer& newcomer);
+  Result admit(Newcomer& newcomer);
   void answer(Newcomer& newcomer);
   Result drop(Newcomer& newcomer) const;
   void end(Newcomer& newcomer);

@@ -2,14 +2,20 @@
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <netinet/in.h>
+#include <netinet/tcp.h>
+#include <poll.h>
+#include <sys/socket.h>
 
 #include <algorithm>
 #include <chrono>
 #include <string>
+#include <string_view>
 
 #include "http/testing/TestCertificates.h"
 #include "http/testing/TestServer.h"
 #include "http/testing/TestWire.h"
+#include "util/FileDescriptor.h"
 
 namespace zorva::http {
 namespace {
@@ -21,6 +27,36 @@ using testing::Server;
 using ::testing::StartsWith;
 using testing::Wire;
 using testing::WireResponse;
+
+/// A port of the loopback interface.
+class Listening {
+ public:
+  Listening() {
+    address_.sin_family = AF_INET;
+    address_.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+    socklen_t size = sizeof address_;
+    EXPECT_EQ(::bind(socket_.get(), place(), size), 0);
+    EXPECT_EQ(::listen(socket_.get(), 1), 0);
+    EXPECT_EQ(::getsockname(socket_.get(), place(), &size), 0);
+  }
+
+  util::FileDescriptor connect() const {
+    util::FileDescriptor client(::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0));
+    EXPECT_EQ(::connect(client.get(), place(), sizeof address_), 0);
+    const int isOn = 1;
+    ::setsockopt(client.get(), IPPROTO_TCP, TCP_NODELAY, &isOn, sizeof isOn);
+    return client;
+  }
+
+  util::FileDescriptor accept() const { return util::FileDescriptor(::accept(socket_.get(), nullptr, nullptr)); }
+
+ private:
+  const sockaddr* place() const { return reinterpret_cast<const sockaddr*>(&address_); }
+  sockaddr* place() { return reinterpret_cast<sockaddr*>(&address_); }
+
+  util::FileDescriptor socket_{::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0)};
+  sockaddr_in address_{};
+};
 
 class Ports : public ::testing::Test {
  protected:
@@ -90,6 +126,90 @@ TEST_F(Ports, ASilentClientIsCutOff) {
   Wire half(server->tlsPort());
   ASSERT_TRUE(half.send(std::string("\x16\x03\x01\x02\x00\x01\x00", 7)));
   for (Wire* each : {&plain, &tls, &half}) EXPECT_TRUE(each->isClosedWithin(seconds(5)));
+}
+
+TEST_F(Ports, OfHttpsNoticeTheEndInTheMiddleOfAHello) {
+  const auto server = serverWith();
+  {
+    Wire half(server->tlsPort());
+    ASSERT_TRUE(half.send(std::string("\x16\x03\x01\x02\x00\x01\x00", 7)));
+  }
+  for (int i = 0; i < 500 && server->http().isBusy(); ++i) std::this_thread::sleep_for(milliseconds(10));
+  EXPECT_FALSE(server->http().isBusy());
+}
+
+/// A connection that Reception has, and its client's end.
+class HalfHello : public ::testing::Test {
+ protected:
+  HalfHello() {
+    const Listening port;
+    client_ = port.connect();
+    Newcomer newcomer;
+    newcomer.socket = port.accept();
+    newcomer.door = Door::Https;
+    newcomer.connection = connections_.add(newcomer.socket.get(), "192.0.2.1", "192.0.2.1");
+    reception_.add(std::move(newcomer));
+  }
+
+  void send(std::string_view bytes) const {
+    ASSERT_EQ(::send(client_.get(), bytes.data(), bytes.size(), MSG_NOSIGNAL), static_cast<ssize_t>(bytes.size()));
+  }
+
+  bool wakes() const {
+    pollfd wait{reception_.descriptor(), POLLIN, 0};
+    return ::poll(&wait, 1, 30) == 1;
+  }
+
+  void lookIfWoken() {
+    if (wakes()) reception_.look();
+  }
+
+  static constexpr std::size_t kLength = 512;
+  const std::string hello_ = std::string("\x16\x03\x01\x02\x00", 5) + std::string(kLength, 'r');
+  Connections connections_;
+  std::size_t admitted_ = 0;
+  std::string bytes_;
+  Reception reception_{connections_, [this](Newcomer&& newcomer) {
+                         ++admitted_;
+                         bytes_.resize(2 * kLength);
+                         const ssize_t got = ::recv(newcomer.socket.get(), bytes_.data(), bytes_.size(), MSG_DONTWAIT);
+                         bytes_.resize(got > 0 ? static_cast<std::size_t>(got) : 0);
+                         connections_.remove(*newcomer.connection);
+                       }};
+  util::FileDescriptor client_;
+};
+
+TEST_F(HalfHello, WakesNoThreadUntilItIsWhole) {
+  send(hello_.substr(0, 1));
+  lookIfWoken();
+  send(hello_.substr(1, 4));
+  lookIfWoken();
+  for (std::size_t at = 5; at + 1 < hello_.size(); at += 50) {
+    send(std::string_view(hello_).substr(at, std::min<std::size_t>(50, hello_.size() - 1 - at)));
+    EXPECT_FALSE(wakes()) << "at byte " << at;
+  }
+  EXPECT_EQ(admitted_, 0U);
+  send(hello_.substr(hello_.size() - 1));
+  EXPECT_TRUE(wakes());
+  reception_.look();
+  EXPECT_EQ(admitted_, 1U);
+  EXPECT_EQ(bytes_, hello_);
+}
+
+TEST_F(HalfHello, OfALengthThatNoRecordHasIsLeftToTheTlsLibrary) {
+  send(std::string("\x16\x03\x01\xff\xff", 5));
+  lookIfWoken();
+  EXPECT_EQ(admitted_, 1U);
+}
+
+TEST_F(HalfHello, IsForgottenWhenItsClientEnds) {
+  send(hello_.substr(0, 100));
+  lookIfWoken();
+  client_.reset();
+  lookIfWoken();
+  EXPECT_EQ(admitted_, 0U);
+  EXPECT_EQ(connections_.count(), 0U);
+  EXPECT_FALSE(wakes());
 }
 
 TEST_F(Ports, SilentClientsGiveWayWhereAllConnectionsAreTaken) {
