@@ -140,6 +140,9 @@ TEST_F(ApplyTest, AUserSeesWhatWouldChangeAndChangesNothing) {
   zorvactl("ifcfg init zvbmc0");
   zorvactl("dns set zvbmc0 192.0.2.77");
   for (const char* place : {"", "run", "data"}) ::chmod((redfish_.directory() / place).c_str(), 0755);
+  if (zorvactlOfAUser("--version").find("zorvactl ") != 0) {
+    GTEST_SKIP() << "another user cannot run what was built here";
+  }
   EXPECT_THAT(zorvactlOfAUser("apply zvbmc0 --dry-run"),
               AllOf(HasSubstr("192.0.2.53 2001:db8::53  ->  192.0.2.77"), HasSubstr("only root may ask zorva-bmc"),
                     Not(HasSubstr("does not answer"))));
