@@ -31,8 +31,7 @@ std::size_t countOf(const http::HeaderList& headers, std::string_view name) {
 }
 
 void checkAdmitted(const http::HttpRequest& request, std::string_view text) {
-  if (!http::asksForPage(request.method, request.path) &&
-      http::allowedMethods("/").find(request.method) == std::string_view::npos) {
+  if (http::allowedMethods(true).find(request.method) == std::string_view::npos) {
     fail("a method that nobody answers was let through", text);
   }
   if (countOf(request.headers, "Content-Length") + countOf(request.headers, "Transfer-Encoding") > 1) {
@@ -61,7 +60,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     request.headers.emplace_back(name, std::string(field));
   }
   constexpr std::size_t kMostBody = 1U << 20;
-  const auto refusal = http::checkHead({request.method, request.path, version, request.headers}, kMostBody);
+  const auto refusal = http::checkHead({request.method, request.path, version, request.headers, true}, kMostBody);
   if (refusal && (refusal->status < 400 || refusal->status > 599 || refusal->why.empty())) {
     fail("a refusal without a reason", text);
   }

@@ -46,7 +46,8 @@ TEST(Origin, OfThisServerHasItsSchemeAndHost) {
 }
 
 TEST(WebPages, GetNoAnswerButARefusalByAnyMethod) {
-  Server server([](const HttpRequest&, ResponseSink& sink) { sink.begin(200, {}); }, {}, "This is a server.\n");
+  Server server([](const HttpRequest&, ResponseSink& sink) { sink.begin(200, {}); }, {},
+                {{"/", textPage("This is a server.\n")}});
   for (const char* first : {"GET / HTTP/1.1", "HEAD / HTTP/1.1", "OPTIONS * HTTP/1.1", "POST /cimom HTTP/1.1",
                             "M-POST /cimom HTTP/1.1", "GET /cimom HTTP/1.1", "PUT / HTTP/1.1"}) {
     for (const char* fields : {"Host: rebound.example.net\r\n", "Host: localhost\r\nOrigin: http://example.net\r\n"}) {
@@ -59,7 +60,8 @@ TEST(WebPages, GetNoAnswerButARefusalByAnyMethod) {
 }
 
 TEST(WebPages, ANameOfTheConfigurationIsAnOwnNameFromThenOn) {
-  Server server([](const HttpRequest&, ResponseSink& sink) { sink.begin(200, {}); }, {}, "This is a server.\n");
+  Server server([](const HttpRequest&, ResponseSink& sink) { sink.begin(200, {}); }, {},
+                {{"/", textPage("This is a server.\n")}});
   const std::string request = "GET / HTTP/1.1\r\nHost: www.example.net\r\n\r\n";
   Wire before(server.port());
   ASSERT_TRUE(before.send(request));

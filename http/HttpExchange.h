@@ -25,6 +25,7 @@
 #include "http/Connections.h"
 #include "http/Exchange.h"
 #include "http/Gzip.h"
+#include "http/Pages.h"
 #include "http/RequestHead.h"
 
 namespace zorva::http {
@@ -48,6 +49,7 @@ class HttpExchange final : public ResponseSink, public std::enable_shared_from_t
 
   HttpRequest request;
   std::optional<Refusal> refusal;  ///< the response, if no work is needed
+  const Page* page = nullptr;      ///< what GET or HEAD asks for; null for CIM operations
   bool headIsRead = false;
   bool awaitsLogin = false;  ///< decide() will be called; used by the event thread
   bool takesGzip = false;

@@ -125,7 +125,7 @@ std::string withoutLineEnd(std::string text) {
 
 class HttpServer::Core {
  public:
-  Core(const HttpLimits& limits, int threads, Handler handler, std::string page, std::shared_ptr<access::Gate> gate);
+  Core(const HttpLimits& limits, int threads, Handler handler, Pages pages, std::shared_ptr<access::Gate> gate);
   ~Core();
 
   void take(int socket, const sockaddr_storage& peer, socklen_t peerSize, Door door);
@@ -179,7 +179,7 @@ class HttpServer::Core {
   std::shared_ptr<const TlsIdentity> tls_;  ///< of new connections
   std::shared_ptr<const HostNames> names_ = std::make_shared<const HostNames>();
   const int threads_;
-  const std::string page_;
+  const Pages pages_;
   const std::shared_ptr<access::Gate> gate_;
   Connections connections_;
   Workers workers_;
@@ -192,13 +192,17 @@ class HttpServer::Core {
   Reception reception_;
 };
 
-HttpServer::Core::Core(const HttpLimits& limits, int threads, Handler handler, std::string page,
+HttpServer::Core::Core(const HttpLimits& limits, int threads, Handler handler, Pages pages,
                        std::shared_ptr<access::Gate> gate)
     : limits_(limits),
       threads_(threads),
-      page_(std::move(page)),
+      pages_(std::move(pages)),
       gate_(std::move(gate)),
-      workers_(limits, [work = std::move(handler)](HttpExchange& exchange) { work(exchange.request, exchange); }),
+      workers_(limits,
+               [work = std::move(handler)](HttpExchange& exchange) {
+                 const Page* page = exchange.page;
+                 page != nullptr ? page->answer(exchange.request, exchange) : work(exchange.request, exchange);
+               }),
       logins_(gate_),
       reception_(connections_, [this](Newcomer&& newcomer) { admitNewcomer(std::move(newcomer)); }) {
   daemon_ = startDaemon(Door::Http);
@@ -414,9 +418,10 @@ std::optional<Refusal> HttpServer::Core::checkRequest(MHD_Connection* connection
   const HttpRequest& request = exchange.request;
   OpenConnection& open = openConnectionOf(connection);
   if (auto refusal = checkWebPage(open, request.headers)) return refusal;
-  if (auto refusal = checkHead({request.method, request.path, version, request.headers}, limits().bodyBytes)) {
-    return refusal;
-  }
+  const Page* page = pageAt(pages_, request.path);
+  const RequestHead head{request.method, request.path, version, request.headers, page != nullptr};
+  if (auto refusal = checkHead(head, limits().bodyBytes)) return refusal;
+  if (isForPages(request.method)) exchange.page = page;
   if (auto refusal = identify(open, sessionOf(connection))) return refusal;
   return admit(exchange);
 }
@@ -448,11 +453,10 @@ std::optional<Refusal> HttpServer::Core::identify(OpenConnection& connection, gn
   return Refusal{403, connection.refusal, {}};
 }
 
-/// Finds out who the client is. The page for people is shown to everybody.
+/// Finds out who the client is. Public pages are shown to everybody.
 std::optional<Refusal> HttpServer::Core::admit(HttpExchange& exchange) {
-  HttpRequest& request = exchange.request;
-  if (asksForPage(request.method, request.path)) return std::nullopt;
-  const std::string* authorization = findHeader(request.headers, MHD_HTTP_HEADER_AUTHORIZATION);
+  if (exchange.page != nullptr && exchange.page->isPublic) return std::nullopt;
+  const std::string* authorization = findHeader(exchange.request.headers, MHD_HTTP_HEADER_AUTHORIZATION);
   access::Decision decision = gate_->decide(exchange.client->origin(), authorization);
   if (decision.kind != access::Decision::Kind::MustVerify) return letIn(exchange, std::move(decision));
   awaitLogin(exchange, authorization);
@@ -513,10 +517,9 @@ void HttpServer::Core::releaseBody(HttpExchange& exchange) {
 bool HttpServer::Core::answersAtOnce(HttpExchange& exchange) const {
   const HttpRequest& request = exchange.request;
   if (request.method == "OPTIONS") {
-    exchange.begin(200, capabilities(request.path));
-  } else if (asksForPage(request.method, request.path)) {
-    exchange.begin(200, {{MHD_HTTP_HEADER_CONTENT_TYPE, "text/plain; charset=utf-8"}});
-    exchange.write(page_);
+    exchange.begin(200, capabilities(pageAt(pages_, request.path) != nullptr));
+  } else if (exchange.page != nullptr && exchange.page->isPublic) {
+    exchange.page->answer(request, exchange);
   } else {
     return false;
   }
@@ -585,9 +588,9 @@ void HttpServer::Core::onLog(void*, const char* format, va_list arguments) {
 
 // ---- HttpServer ----
 
-HttpServer::HttpServer(const HttpLimits& limits, int threads, Handler handler, std::string page,
+HttpServer::HttpServer(const HttpLimits& limits, int threads, Handler handler, Pages pages,
                        std::shared_ptr<access::Gate> gate)
-    : core_(std::make_unique<Core>(limits, threads, std::move(handler), std::move(page), std::move(gate))) {}
+    : core_(std::make_unique<Core>(limits, threads, std::move(handler), std::move(pages), std::move(gate))) {}
 
 HttpServer::~HttpServer() = default;
 

@@ -18,6 +18,7 @@
 #include "http/Door.h"
 #include "http/Exchange.h"
 #include "http/HttpLimits.h"
+#include "http/Pages.h"
 #include "http/TlsIdentity.h"
 #include "util/NotCopied.h"
 
@@ -29,9 +30,9 @@ class HttpServer : util::NotCopied {
   using Handler = std::function<void(const HttpRequest&, ResponseSink&)>;
 
   /// A request whose handler does not return in time gets the late answer that the handler has set, on the thread that
-  /// sweeps; without one, status 500 with a sentence. `page` is the response to GET of "/". `gate` says who a client
-  /// is. Throws std::runtime_error if the threads cannot be started.
-  HttpServer(const HttpLimits& limits, int threads, Handler handler, std::string page = {},
+  /// sweeps; without one, status 500 with a sentence. `pages` answer GET and HEAD. `gate` says who a client is. Throws
+  /// std::runtime_error if the threads cannot be started.
+  HttpServer(const HttpLimits& limits, int threads, Handler handler, Pages pages = {},
              std::shared_ptr<access::Gate> gate = std::make_shared<access::OpenGate>(access::Role::Operate));
 
   /// Ends all connections, and waits for handlers that have not returned.

@@ -504,7 +504,7 @@ TEST(HttpServer, HeaderFieldsWithoutAValueAreSent) {
 }
 
 TEST(HttpServer, TheRootSaysToAPersonWhatThisIs) {
-  Server server(echo, {}, "This is a server.\n");
+  Server server(echo, {}, {{"/", textPage("This is a server.\n")}});
   Wire wire(server.port());
   ASSERT_TRUE(wire.send("GET / HTTP/1.1\r\nHost: localhost\r\n\r\n"));
   const WireResponse page = wire.receive();
@@ -515,6 +515,38 @@ TEST(HttpServer, TheRootSaysToAPersonWhatThisIs) {
   const std::string head = wire.take(10000, seconds(20));
   EXPECT_THAT(head, ::testing::StartsWith("HTTP/1.1 200 "));
   EXPECT_THAT(head, ::testing::EndsWith("\r\n\r\n"));
+}
+
+/// Lets in whoever sends a field Authorization.
+class LoginOnly final : public access::Gate {
+ public:
+  access::Decision decide(const access::Origin&, const std::string* authorization) override {
+    if (authorization == nullptr) return {access::Decision::Kind::NeedsLogin, nullptr, "log in"};
+    return {access::Decision::Kind::Admitted, std::make_shared<const access::Client>()};
+  }
+  access::Decision verify(const access::Origin&, const std::string&) override { return {}; }
+};
+
+TEST(HttpServer, APageIsPublicOrForClientsThatTheGateLetsIn) {
+  const Page forClients{[](const HttpRequest& request, ResponseSink& sink) {
+    sink.begin(200, {{"Content-Type", "text/plain"}});
+    sink.write(request.who != nullptr && request.path == "/clients?a=b" ? "for clients" : "for nobody");
+  }};
+  Server server(echo, {}, {{"/public", textPage("for all")}, {"/clients", forClients}}, std::make_shared<LoginOnly>());
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send("GET /public HTTP/1.1\r\nHost: localhost\r\n\r\n"));
+  EXPECT_EQ(wire.receive().body, "for all");
+  ASSERT_TRUE(wire.send("GET /clients?a=b HTTP/1.1\r\nHost: localhost\r\nAuthorization: Basic x\r\n\r\n"));
+  EXPECT_EQ(wire.receive().body, "for clients");
+  ASSERT_TRUE(wire.send("GET /clients HTTP/1.1\r\nHost: localhost\r\n\r\n"));
+  EXPECT_EQ(wire.receive().status, 401);
+}
+
+TEST(HttpServer, ARequestByPostIsNoRequestForAPage) {
+  Server server(echo, {}, {{"/x", textPage("a page")}});
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send(testing::posting("a body")));
+  EXPECT_EQ(wire.receive().body, "a body");
 }
 
 TEST(HttpServer, OtherMethodsAreTurnedDown) {

@@ -66,7 +66,8 @@ class Https : public ::testing::Test {
           sink.begin(200, {{"Content-Type", "application/xml"}});
           sink.write(request.body);
         },
-        HttpLimits(), "This is a server.\n", gate_, TlsIdentity::load({server_.certificate, server_.key, clientCa}));
+        HttpLimits(), Pages{{"/", textPage("This is a server.\n")}}, gate_,
+        TlsIdentity::load({server_.certificate, server_.key, clientCa}));
   }
 
   const agent::testing::TemporaryDirectory directory_;

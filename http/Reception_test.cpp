@@ -67,8 +67,8 @@ class Ports : public ::testing::Test {
 
   std::unique_ptr<Server> serverWith(const HttpLimits& limits = {}) const {
     return std::make_unique<Server>([](const HttpRequest&, ResponseSink& sink) { sink.begin(200, {}); }, limits,
-                                    "This is a server.\n", std::make_shared<access::OpenGate>(access::Role::Read),
-                                    identity());
+                                    Pages{{"/", textPage("This is a server.\n")}},
+                                    std::make_shared<access::OpenGate>(access::Role::Read), identity());
   }
 
   const agent::testing::TemporaryDirectory directory_;

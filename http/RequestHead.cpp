@@ -96,16 +96,16 @@ std::optional<Refusal> checkFraming(const RequestHead& head, std::size_t most) {
 
 std::optional<Refusal> checkMethod(const RequestHead& head) {
   if (head.method == "POST" || head.method == "M-POST" || head.method == "OPTIONS") return std::nullopt;
-  if (asksForPage(head.method, head.path)) return std::nullopt;
+  if (head.hasPage && isForPages(head.method)) return std::nullopt;
   constexpr std::string_view kKnown[] = {"GET", "HEAD", "PUT", "DELETE", "PATCH", "TRACE", "CONNECT"};
   if (std::find(std::begin(kKnown), std::end(kKnown), head.method) != std::end(kKnown)) {
     return Refusal{405,
                    "CIM operations come by POST or M-POST (DSP0200); a browser cannot show them",
                    {},
-                   allowedMethods(head.path)};
+                   allowedMethods(head.hasPage)};
   }
   return Refusal{
-      501, "there is no such method here; CIM operations come by POST or M-POST", {}, allowedMethods(head.path)};
+      501, "there is no such method here; CIM operations come by POST or M-POST", {}, allowedMethods(head.hasPage)};
 }
 
 bool isUtf8Name(std::string_view charset) {
@@ -189,7 +189,7 @@ std::optional<Refusal> checkHead(const RequestHead& head, std::size_t mostBodyBy
   if (auto refusal = checkFraming(head, mostBodyBytes)) return refusal;
   if (auto refusal = checkMethod(head)) return refusal;
   if (auto refusal = checkExpect(head.headers)) return refusal;
-  if (head.method == "OPTIONS" || asksForPage(head.method, head.path)) return std::nullopt;
+  if (head.method == "OPTIONS" || isForPages(head.method)) return std::nullopt;
   if (findHeader(head.headers, "Content-Length") == nullptr &&
       findHeader(head.headers, "Transfer-Encoding") == nullptr) {
     return Refusal{411, "a request needs a Content-Length, or a chunked body", {}};
@@ -198,17 +198,15 @@ std::optional<Refusal> checkHead(const RequestHead& head, std::size_t mostBodyBy
   return checkAccept(head.headers);
 }
 
-std::string_view allowedMethods(std::string_view path) {
-  return path == "/" ? "GET, HEAD, POST, M-POST, OPTIONS" : "POST, M-POST, OPTIONS";
+std::string_view allowedMethods(bool hasPage) {
+  return hasPage ? "GET, HEAD, POST, M-POST, OPTIONS" : "POST, M-POST, OPTIONS";
 }
 
-bool asksForPage(std::string_view method, std::string_view path) {
-  return path == "/" && (method == "GET" || method == "HEAD");
-}
+bool isForPages(std::string_view method) { return method == "GET" || method == "HEAD"; }
 
-HeaderList capabilities(std::string_view path) {
+HeaderList capabilities(bool hasPage) {
   // Qualifier types can be read but not changed, so their group is not included.
-  return {{"Allow", std::string(allowedMethods(path))},
+  return {{"Allow", std::string(allowedMethods(hasPage))},
           {"Opt", "http://www.dmtf.org/cim/mapping/http/v1.0 ; ns=77"},
           {"77-CIMProtocolVersion", "1.4"},
           {"77-CIMSupportedFunctionalGroups", "basic-read, basic-write, instance-manipulation, association-traversal"},

@@ -18,6 +18,7 @@ struct RequestHead {
   std::string_view path;
   std::string_view version;  ///< "HTTP/1.1"
   const HeaderList& headers;
+  bool hasPage = false;  ///< the path has a page, which GET and HEAD return
 };
 
 /// A response that needs no CIM operation.
@@ -31,7 +32,7 @@ struct Refusal {
 };
 
 /// Whether the request may go on to its body. Requests that are answered without a body may: OPTIONS, and GET and HEAD
-/// of "/".
+/// of a page.
 ///
 /// Whatever two readers could understand differently is refused, because one of them might be a proxy: Content-Length
 /// or Transfer-Encoding twice or together, codings after or instead of "chunked", invalid characters in names.
@@ -43,13 +44,13 @@ const std::string* findHeader(const HeaderList& headers, std::string_view name);
 /// Whether a list such as that of TE or Accept-Encoding has that word, with a weight above 0 (RFC 9110 12.4.2).
 bool listHas(const HeaderList& headers, std::string_view name, std::string_view word);
 
-/// The methods of a path, as the header Allow lists them. Only the root has a page for people.
-std::string_view allowedMethods(std::string_view path);
+/// The methods of a path, as the header Allow lists them.
+std::string_view allowedMethods(bool hasPage);
 
-/// True for GET and HEAD of the root: a person looks at the server with a browser.
-bool asksForPage(std::string_view method, std::string_view path);
+/// True for GET and HEAD.
+bool isForPages(std::string_view method);
 
 /// The response to OPTIONS: the server's capabilities (DSP0200 7.5).
-HeaderList capabilities(std::string_view path);
+HeaderList capabilities(bool hasPage);
 
 }  // namespace zorva::http

@@ -122,6 +122,13 @@ void mendSettings() noexcept {
   }
 }
 
+/// What GET returns.
+http::Pages pagesOf(const std::vector<http::Listener>& listeners) {
+  http::Pages pages;
+  pages.emplace("/", http::textPage(pageOf(listeners)));
+  return pages;
+}
+
 /// Whether they differ in what only a start applies.
 bool needsRestart(const Config& before, const Config& after) {
   const auto fixed = [](const Config& config) {
@@ -186,7 +193,7 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
       [service = service_.get()](const http::HttpRequest& request, http::ResponseSink& sink) {
         service->handle(request, sink);
       },
-      pageOf(listeners_), gate_);
+      pagesOf(listeners_), gate_);
   server_->setHostNames(config_.names);
   server_->setAudit([this](const access::AuditRecord& record) { audit_->take(record); });
   if (!config_.tls.certificate.empty()) certificate_.use(config_.tls, *server_);

@@ -23,11 +23,11 @@ namespace zorva::http::testing {
 class Server : util::NotCopied {
  public:
   /// With an identity it speaks HTTPS as well.
-  explicit Server(HttpServer::Handler handler, const HttpLimits& limits = {}, std::string page = {},
+  explicit Server(HttpServer::Handler handler, const HttpLimits& limits = {}, Pages pages = {},
                   std::shared_ptr<access::Gate> gate = std::make_shared<access::OpenGate>(access::Role::Operate),
                   const std::shared_ptr<const TlsIdentity>& tls = nullptr)
       : listeners_(listenOn(Addresses{"127.0.0.1"}, 0)),
-        server_(limits, 2, std::move(handler), std::move(page), std::move(gate)) {
+        server_(limits, 2, std::move(handler), std::move(pages), std::move(gate)) {
     if (tls != nullptr) {
       listeners_.push_back(std::move(listenOn(Addresses{"127.0.0.1"}, 0, Door::Https).front()));
       server_.setTls(tls);
