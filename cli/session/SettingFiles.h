@@ -7,17 +7,12 @@
 
 #include "agent/tree/TreeSnapshot.h"
 #include "cli/session/Session.h"
+#include "frontend/SettingFiles.h"
 
 namespace zorva::cli {
 
-struct SettingFiles {
-  std::vector<std::string> interfaces;  ///< the interfaces that they are named for, in order
-  int error = 0;                        ///< errno if the directory cannot be read
-
-  bool has(const std::string& interface) const;
-};
-
-SettingFiles findSettingFiles();
+using frontend::findSettingFiles;
+using frontend::SettingFiles;
 
 /// Those of the interfaces that are not in the tree.
 std::vector<std::string> orphansAmong(const SettingFiles& files, const zorva::agent::TreeSnapshot& tree);
