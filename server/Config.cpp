@@ -85,6 +85,7 @@ void readHttp(Config& config, const util::TomlDocument& document) {
   util::TomlTable http(document, "http");
   http.take("threads", config.threads);
   http.take("gzip", config.limits.gzip);
+  http.take("console", config.hasConsole);
   http.finish();
 }
 

@@ -40,7 +40,8 @@ struct Config {
   int nesting = 128;  ///< the deepest nesting of elements in a request
 
   /// [http]
-  int threads = 2;  ///< for input and output; other threads wait for providers
+  int threads = 2;         ///< for input and output; other threads wait for providers
+  bool hasConsole = true;  ///< a browser gets the page of console/
 
   /// [pull]
   int pullContexts = 100;        ///< enumerations that are open at once

@@ -177,6 +177,12 @@ constexpr TomlKey kHttp[] = {
      .standard = "true",
      .example = "false",
      .meaning = "Whether responses are compressed for clients that accept it."},
+    {.name = "console",
+     .type = TomlType::Switch,
+     .standard = "true",
+     .example = "false",
+     .meaning = "Whether a browser that opens the server's URL gets the console, a page that shows and changes the "
+                "settings. From the next start on."},
 };
 
 constexpr TomlKey kPull[] = {

@@ -35,8 +35,10 @@
 #include "server/AuditLog.h"
 #include "server/BrokerLog.h"
 #include "server/CertificateInUse.h"
+#include "server/ConsolePages.h"
 #include "server/Entrances.h"
 #include "server/MakeCertificate.h"
+#include "server/SettingOrigins.h"
 #include "server/Systemd.h"
 #include "util/FileDescriptor.h"
 
@@ -123,9 +125,10 @@ void mendSettings() noexcept {
 }
 
 /// What GET returns.
-http::Pages pagesOf(const std::vector<http::Listener>& listeners) {
+http::Pages pagesOf(const Config& config, const std::vector<http::Listener>& listeners) {
   http::Pages pages;
   pages.emplace("/", http::textPage(pageOf(listeners)));
+  if (config.hasConsole) addConsole(pages);
   return pages;
 }
 
@@ -133,7 +136,7 @@ http::Pages pagesOf(const std::vector<http::Listener>& listeners) {
 bool needsRestart(const Config& before, const Config& after) {
   const auto fixed = [](const Config& config) {
     return std::tuple(config.addresses, config.port, config.socket, config.tls.certificate.empty(), config.tlsAddresses,
-                      config.tlsPort, config.threads, config.nesting, config.providerDirectory);
+                      config.tlsPort, config.threads, config.nesting, config.hasConsole, config.providerDirectory);
   };
   return fixed(before) != fixed(after);
 }
@@ -193,7 +196,7 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
       [service = service_.get()](const http::HttpRequest& request, http::ResponseSink& sink) {
         service->handle(request, sink);
       },
-      pagesOf(listeners_), gate_);
+      pagesOf(config_, listeners_), gate_);
   server_->setHostNames(config_.names);
   server_->setAudit([this](const access::AuditRecord& record) { audit_->take(record); });
   if (!config_.tls.certificate.empty()) certificate_.use(config_.tls, *server_);
@@ -398,6 +401,7 @@ std::unique_ptr<broker::Broker> makeBuiltInBroker(const Config& config) {
   options.claim = frontend::SettingsClaims().hook();
   const auto classes = schema::loadBuiltInClasses(schema::ClassSet::Interop);
   frontend::addProviders(config.addedProviders, options.registry, *classes);
+  serveSettingOrigins(options);
   cimom::serveInterop(options);
   return std::make_unique<broker::Broker>(classes, std::move(options));
 }

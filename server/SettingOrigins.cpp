@@ -1,0 +1,117 @@
+#include "server/SettingOrigins.h"
+
+#include <set>
+#include <string>
+#include <utility>
+
+#include "agent/Agent.h"
+#include "frontend/SettingFiles.h"
+#include "frontend/SettingsClaims.h"
+#include "host/HostProvider.h"
+
+namespace zorva::server {
+
+namespace {
+
+using agent::Node;
+using host::HostObject;
+
+constexpr const char* kClass = "ZORVA_DNSSettingOrigin";
+constexpr const char* kPrefix = "SettingOrigin";
+
+void addText(HostObject& object, const char* name, const std::string* text) {
+  if (text != nullptr && !text->empty()) object.properties.push_back({name, *text});
+}
+
+void addList(HostObject& object, const char* name, const agent::StringList* list) {
+  if (list != nullptr && !list->empty()) object.properties.push_back({name, *list});
+}
+
+/// The endpoint's properties whose values were set.
+agent::StringList setProperties(const Node& node) {
+  constexpr std::pair<agent::PropertyNumber, const char*> kNames[] = {
+      {ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES, "DNSServerAddresses"},
+      {ZV::NodeLexicon::PROP_HOST_NAME, "Hostname"},
+      {ZV::NodeLexicon::PROP_DOMAIN_NAME, "DomainName"},
+      {ZV::NodeLexicon::PROP_DNS_SUFFIXES, "DNSSuffixesToAppend"},
+  };
+  agent::StringList names;
+  for (const auto& [number, name] : kNames) {
+    const agent::Property* property = node.find(number);
+    if (property != nullptr && property->overlaid) names.emplace_back(name);
+  }
+  return names;
+}
+
+HostObject originOf(const std::string& id, const std::string& interface, const frontend::SettingFiles& files) {
+  HostObject origin{kClass, {{"InstanceID", id}}, {}};
+  if (interface.empty()) return origin;
+  const std::string file = "ifcfg-" + interface;
+  origin.properties.push_back({"FileName", file});
+  if (files.has(interface)) origin.properties.push_back({"File", file});
+  return origin;
+}
+
+void addOwner(HostObject& origin, const Node& node) {
+  addText(origin, "Owner", node.text(agent::kDnsOwner));
+  addText(origin, "OwnerProfile", node.text(agent::kDnsProfile));
+  addText(origin, "OwnerOrigin", node.text(agent::kDnsOrigin));
+  addList(origin, "OwnerServers", node.list(ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES));
+}
+
+HostObject originOfInterface(const Node& node, const std::string& name, bool isServiceProcessor,
+                             const frontend::SettingFiles& files) {
+  HostObject origin = originOf((isServiceProcessor ? "BMC%" : "Computer%") + name, name, files);
+  addOwner(origin, node);
+  const agent::StringList set = setProperties(node);
+  addList(origin, "SetProperties", &set);
+  return origin;
+}
+
+HostObject originOfHost(const agent::TreeSnapshot& tree, const frontend::SettingFiles& files) {
+  const std::string& configured = agent::currentConfig().systemName;
+  const std::string& name = configured.empty() ? tree.systemName() : configured;
+  HostObject origin = originOf("dnsgen1:" + name, frontend::interfaceOfHostSettings(tree).value_or(""), files);
+  for (const Node& node : tree.nodes()) {
+    if (node.type() != agent::NodeType::System || node.isServiceProcessor()) continue;
+    addOwner(origin, node);
+    addList(origin, "ResolverServers", node.list(agent::kResolverServers));
+    addList(origin, "ResolverServersNotAsked", node.list(agent::kResolverNotAsked));
+    addList(origin, "ResolverSearch", node.list(agent::kResolverSearch));
+    break;
+  }
+  return origin;
+}
+
+using Provider = host::Provider<settingOrigins>;
+
+CMPIInstanceMI* create(const CMPIBroker* broker, const CMPIContext*, CMPIStatus*) {
+  static CMPIInstanceMIFT table = Provider::table("instanceSettingOrigin");
+  static CMPIInstanceMI mi = {nullptr, &table};
+  Provider::broker = broker;
+  return &mi;
+}
+
+}  // namespace
+
+std::vector<HostObject> settingOrigins(const agent::TreeSnapshot& tree) {
+  const frontend::SettingFiles files = frontend::findSettingFiles();
+  std::vector<HostObject> origins;
+  std::set<std::pair<bool, std::string>> seen;
+  for (const Node& node : tree.nodes()) {
+    const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
+    if (node.type() != agent::NodeType::NetworkIPConfig || name == nullptr) continue;
+    const bool isServiceProcessor = tree.parent(tree.parent(node)).isServiceProcessor();
+    if (!seen.emplace(isServiceProcessor, *name).second) continue;
+    origins.push_back(originOfInterface(node, *name, isServiceProcessor, files));
+  }
+  origins.push_back(originOfHost(tree, files));
+  return origins;
+}
+
+void serveSettingOrigins(broker::BrokerOptions& options) {
+  options.registry.add({kClass, kPrefix, "", broker::InstanceMi});
+  options.linked.push_back({std::string(kPrefix) + "_Create_InstanceMI", reinterpret_cast<void (*)()>(create)});
+}
+
+}  // namespace zorva::server
