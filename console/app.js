@@ -63,6 +63,7 @@ class App {
   trialEnded(text, kind) {
     this.trial = null;
     this.tell(text, kind);
+    this.main.focus({ preventScroll: true });
     this.reload();
   }
 

@@ -44,14 +44,10 @@ export function field(label, control, hint) {
     hint && h("p", { class: "hint", id: hintId }, hint));
 }
 
-/** Shows a modal dialog, and removes it when it is closed. The focus returns to where it was. */
+/** Shows a modal dialog, and removes it when it is closed. The browser gives the focus back to where it was. */
 export function openDialog(dialog) {
-  const before = document.activeElement;
   document.body.append(dialog);
-  dialog.addEventListener("close", () => {
-    dialog.remove();
-    if (before?.isConnected) before.focus();
-  });
+  dialog.addEventListener("close", () => dialog.remove());
   dialog.showModal();
   return dialog;
 }

@@ -4,7 +4,7 @@ import { h, svg } from "./dom.js";
 import { t } from "./texts.js";
 
 const AT_ONCE = 24;
-const NODE = { width: 250, height: 66, gap: 14 };
+const NODE = { width: 290, height: 66, gap: 14 };
 const NARROW = 760; // below this width the far ends are listed under the object
 
 // Ends that stand above the other one, and so on the left.
@@ -46,8 +46,13 @@ function fitted(text, room) {
   return text.length <= room ? text : `${text.slice(0, room - 1)}…`;
 }
 
+/** The width of a character on average, by the class of its line. */
+const CHARACTER = { small: 6.4, class: 7.4, name: 8.6 };
+
 function nodeOf({ x, y, width, lines, label, link, isFocus }) {
-  const texts = lines.map(([text, className], i) => svg("text", { x: 14, y: 20 + i * 18, class: className }, fitted(text, Math.floor(width / 7.6) - 2)));
+  const first = (NODE.height - (lines.length - 1) * 18) / 2 + 5;
+  const texts = lines.map(([text, className], i) => svg("text", { x: 14, y: first + i * 18, class: className },
+    fitted(text, Math.floor((width - 24) / CHARACTER[className]))));
   const box = svg("rect", { width, height: NODE.height, rx: 8 });
   const group = { transform: `translate(${x} ${y})`, class: isFocus ? "node focus" : link ? "node" : "node dead" };
   const content = [svg("title", {}, label), box, texts];
@@ -66,7 +71,7 @@ function farNode(end, x, y, width) {
   const name = isDead ? t("noKeys") : labelOf(end.path);
   return nodeOf({
     x, y, width, link: isDead ? null : linkTo(end.path),
-    lines: [[`${shortClass(end.association)} → ${end.role}`, "small"], [shortClass(end.path.className), "class"], [name, "name"]],
+    lines: [[`${end.role} · ${shortClass(end.association)}`, "small"], [shortClass(end.path.className), "class"], [name, "name"]],
     label: `${shortClass(end.association)}, ${end.role}: ${shortClass(end.path.className)} ${name}`,
   });
 }
@@ -74,7 +79,7 @@ function farNode(end, x, y, width) {
 function wide(focus, ends, width) {
   const sides = [ends.filter((end) => UPPER.has(end.role)), ends.filter((end) => !UPPER.has(end.role))];
   const height = Math.max(NODE.height, ...sides.map((side) => stackHeight(side.length)));
-  const nodeWidth = Math.min(NODE.width + 30, Math.floor((width - 120) / 3));
+  const nodeWidth = Math.min(NODE.width, Math.floor((width - 120) / 3));
   const center = { x: (width - nodeWidth) / 2, y: (height - NODE.height) / 2 };
   const middle = height / 2;
   const parts = sides.flatMap((side, which) => side.map((end, i) => {

@@ -1,6 +1,7 @@
 // What the page knows of the host, gathered from CIM instances.
 
 import { sameServer, serverProblem } from "./rules.js";
+import { t } from "./texts.js";
 
 export const ENDPOINT = "ZORVA_DNSProtocolEndPoint";
 export const SETTING = "ZORVA_DNSSettingData";
@@ -116,13 +117,14 @@ function describe(row) {
   row.sought = [row.name, ...row.servers, row.domain, ...row.suffixes, row.from].join("\n").toLowerCase();
 }
 
-/** In words as zorvactl has them, who supplies an interface's values. */
+/** In the words of zorvactl, who supplies an interface's values. */
 function fromOf(origin) {
   if (origin.File) return origin.File;
   if ((origin.SetProperties ?? []).length > 0) return "overlay.json";
   if (!origin.Owner) return "";
   if (!origin.OwnerProfile) return origin.Owner;
-  return `${origin.Owner}, ${origin.OwnerProfile.split("/").at(-1)}`;
+  const isPath = origin.OwnerProfile.startsWith("/");
+  return t(isPath ? "ownerAndFile" : "ownerAndProfile", { owner: origin.Owner, profile: origin.OwnerProfile.split("/").at(-1) });
 }
 
 const endpointNames = { RequestedHostname: "Hostname" };

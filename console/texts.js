@@ -20,6 +20,7 @@ const en = {
   serverOrder: "Servers, in the order in which they are asked", profile: "Profile", origin: "Origin", hostName: "Host name", system: "System",
   serversOfOwner: "Servers of the owner", settings: "Settings", setting: "Setting", value: "Value", bmc: "service processor",
   from_file: "{file}", from_host: "host", from_owner: "{owner}", from_set: "set, overlay.json", from_none: "–",
+  ownerAndProfile: "{owner}, profile {profile}", ownerAndFile: "{owner}, {profile}",
   noSuchInterface: "This host has no interface {name}.", back: "All interfaces", showGraph: "Show in the graph",
   changeInterface: "Change servers and domain", changeOf: "Change {what}", oneEachLine: "One in each line, in the order in which they are asked.",
   suffixHint: "One in each line, in the order in which they are tried.", domainHint: "Empty: none.",
@@ -27,7 +28,7 @@ const en = {
   confirmHint: "Unless you confirm in time, this page writes the former values back.",
   preview: "Preview", previewTitle: "This would change", now: "Now", after: "After", object: "Object", apply: "Apply", edit: "Back",
   nothingChanges: "Nothing would change.", fileMissing: "{property} would not be stored: {file} does not exist. On the host, 'zorvactl ifcfg init {name}' makes it.",
-  applied: "Changed. Kept unless taken back: {count} s left", keep: "Keep", rollBack: "Roll back now", kept: "Kept.", stored: "Stored.",
+  applied: "Changed on trial. It is taken back in {count} s unless you keep it.", keep: "Keep", rollBack: "Roll back now", kept: "Kept.", stored: "Stored.",
   rolledBack: "Rolled back: the former values are stored again.",
   rollBackFailed: "The former values could not be written back: {why}", rollBackLost: "The server does not answer; the page goes on trying to write the former values back.",
   changedMeanwhile: "Not rolled back: somebody else has changed {property} since.",
@@ -45,7 +46,7 @@ const en = {
   loginWrong: "The server did not take this login: {why}", loggedIn: "Logged in as {name}.", loggedOut: "Logged out.",
   graphOf: "Associations of {name}", graphHint: "Choose an object to walk on. Arrow keys move between the objects, Enter walks.",
   noAssociations: "This object has no associations.", more: "Show more", shownOf: "{count} shown; there are more.", properties: "Properties",
-  property: "Property", association: "Association", farEnd: "Far end", role: "Role", noKeys: "(without keys)", notThere: "This object cannot be read: {why}", asTable: "The same as a table", path: "Way so far",
+  property: "Property", association: "Association", farEnd: "Far end", role: "Role", noKeys: "(without keys)", notThere: "This object cannot be read: {why}", asTable: "The same as a table",
   footer: "The console of zorvacimd. It asks the server by CIM-XML, as any CIM client does.",
 };
 
@@ -69,6 +70,7 @@ const de = {
   serverOrder: "Server in der Reihenfolge, in der sie gefragt werden", profile: "Profil", origin: "Herkunft", hostName: "Rechnername", system: "System",
   serversOfOwner: "Server des Besitzers", settings: "Einstellungen", setting: "Einstellung", value: "Wert", bmc: "Serviceprozessor",
   from_file: "{file}", from_host: "Rechner", from_owner: "{owner}", from_set: "gesetzt, overlay.json", from_none: "–",
+  ownerAndProfile: "{owner}, Profil {profile}", ownerAndFile: "{owner}, {profile}",
   noSuchInterface: "Dieser Rechner hat keine Schnittstelle {name}.", back: "Alle Schnittstellen", showGraph: "Im Graphen zeigen",
   changeInterface: "Server und Domain ändern", changeOf: "{what} ändern", oneEachLine: "Einer je Zeile, in der Reihenfolge, in der sie gefragt werden.",
   suffixHint: "Eines je Zeile, in der Reihenfolge, in der sie versucht werden.", domainHint: "Leer: keine.",
@@ -76,7 +78,7 @@ const de = {
   confirmHint: "Ohne rechtzeitige Bestätigung schreibt diese Seite die früheren Werte zurück.",
   preview: "Vorschau", previewTitle: "Das würde sich ändern", now: "Jetzt", after: "Danach", object: "Objekt", apply: "Anwenden", edit: "Zurück",
   nothingChanges: "Nichts würde sich ändern.", fileMissing: "{property} würde nicht gespeichert: {file} gibt es nicht. Auf dem Rechner legt 'zorvactl ifcfg init {name}' die Datei an.",
-  applied: "Geändert. Wird zurückgenommen, wenn niemand bestätigt: noch {count} s", keep: "Behalten", rollBack: "Jetzt zurücknehmen", kept: "Behalten.", stored: "Gespeichert.",
+  applied: "Auf Probe geändert. In {count} s wird es zurückgenommen, wenn Sie es nicht behalten.", keep: "Behalten", rollBack: "Jetzt zurücknehmen", kept: "Behalten.", stored: "Gespeichert.",
   rolledBack: "Zurückgenommen: Die früheren Werte sind wieder gespeichert.",
   rollBackFailed: "Die früheren Werte konnten nicht zurückgeschrieben werden: {why}", rollBackLost: "Der Server antwortet nicht; die Seite versucht weiter, die früheren Werte zurückzuschreiben.",
   changedMeanwhile: "Nicht zurückgenommen: {property} wurde inzwischen von jemand anderem geändert.",
@@ -94,7 +96,7 @@ const de = {
   loginWrong: "Der Server hat diese Anmeldung nicht angenommen: {why}", loggedIn: "Angemeldet als {name}.", loggedOut: "Abgemeldet.",
   graphOf: "Assoziationen von {name}", graphHint: "Wählen Sie ein Objekt, um weiterzugehen. Pfeiltasten wechseln zwischen den Objekten, Enter geht weiter.",
   noAssociations: "Dieses Objekt hat keine Assoziationen.", more: "Mehr zeigen", shownOf: "{count} gezeigt; es gibt mehr.", properties: "Eigenschaften",
-  property: "Eigenschaft", association: "Assoziation", farEnd: "Gegenüber", role: "Rolle", noKeys: "(ohne Schlüssel)", notThere: "Dieses Objekt kann nicht gelesen werden: {why}", asTable: "Dasselbe als Tabelle", path: "Weg bis hier",
+  property: "Eigenschaft", association: "Assoziation", farEnd: "Gegenüber", role: "Rolle", noKeys: "(ohne Schlüssel)", notThere: "Dieses Objekt kann nicht gelesen werden: {why}", asTable: "Dasselbe als Tabelle",
   footer: "Die Konsole von zorvacimd. Sie fragt den Server mit CIM-XML wie jeder CIM-Client.",
 };
 

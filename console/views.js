@@ -75,7 +75,7 @@ export function overview(app) {
   const { host } = app;
   const table = interfaceTable();
   const count = h("p", { class: "count", role: "status" });
-  const input = h("input", { type: "search", spellcheck: "false" });
+  const input = h("input", { type: "search", spellcheck: "false", placeholder: t("filterHint") });
   input.value = app.filter;
   const filter = () => {
     app.filter = input.value;
@@ -88,7 +88,7 @@ export function overview(app) {
   input.addEventListener("input", filter);
   filter();
   const element = h("div", {}, h("div", { class: "cards" }, hostCard(app, host), findingsCard(host)),
-    h("section", { class: "card interfaces" }, h("div", { class: "bar" }, h("h2", {}, t("interfaces")), field(t("filter"), input, t("filterHint")), count), table.element));
+    h("section", { class: "card interfaces" }, h("div", { class: "bar" }, h("h2", {}, t("interfaces")), count, field(t("filter"), input)), table.element));
   return { title: t("of", { host: host.name }), element, start: () => table.start(), stop: () => table.stop() };
 }
 

@@ -10,6 +10,7 @@ test_packages=(python3 python3-jsonschema jq git libgtest-dev libgmock-dev binut
 clang_packages=(clang clang-tidy)
 deb_packages=(debhelper dpkg-dev)
 deb_test_packages=(debootstrap iproute2 lintian)
+console_packages=(chromium chromium-driver fonts-dejavu-core python3 openssl iproute2)
 bench_packages=(python3 libbenchmark-dev iproute2 wrk)
 
 die() {
