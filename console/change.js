@@ -97,7 +97,8 @@ export class ChangeDialog {
 
   #showPreview(values, changed) {
     const names = Object.keys(changed);
-    const rows = names.map((name) => h("tr", {}, h("th", { scope: "row" }, name), h("td", {}, shown(this.before[name])), h("td", {}, shown(changed[name]))));
+    const rows = names.map((name) => h("tr", {}, h("th", { scope: "row" }, name), h("td", { "data-label": t("now") }, shown(this.before[name])),
+      h("td", { "data-label": t("after") }, shown(changed[name]))));
     const table = h("table", { class: "preview" },
       h("thead", {}, h("tr", {}, [t("property"), t("now"), t("after")].map((text) => h("th", { scope: "col" }, text)))), h("tbody", {}, rows));
     const { origin } = this.target;

@@ -47,7 +47,7 @@ function fitted(text, room) {
 }
 
 /** The width of a character on average, by the class of its line. */
-const CHARACTER = { small: 6.4, class: 7.4, name: 8.6 };
+const CHARACTER = { small: 6.9, class: 7.6, name: 8.8 };
 
 function nodeOf({ x, y, width, lines, label, link, isFocus }) {
   const first = (NODE.height - (lines.length - 1) * 18) / 2 + 5;
@@ -79,12 +79,15 @@ function farNode(end, x, y, width) {
 function wide(focus, ends, width) {
   const sides = [ends.filter((end) => UPPER.has(end.role)), ends.filter((end) => !UPPER.has(end.role))];
   const height = Math.max(NODE.height, ...sides.map((side) => stackHeight(side.length)));
+  const columns = sides.filter((side) => side.length > 0).length + 1;
   const nodeWidth = Math.min(NODE.width, Math.floor((width - 120) / 3));
-  const center = { x: (width - nodeWidth) / 2, y: (height - NODE.height) / 2 };
+  const gap = Math.min(190, (width - columns * nodeWidth) / Math.max(1, columns - 1));
+  const used = columns * nodeWidth + (columns - 1) * gap;
+  const center = { x: sides[0].length > 0 ? nodeWidth + gap : 1, y: (height - NODE.height) / 2 };
   const middle = height / 2;
   const parts = sides.flatMap((side, which) => side.map((end, i) => {
     const top = (height - stackHeight(side.length)) / 2 + i * (NODE.height + NODE.gap);
-    const x = which === 0 ? 1 : width - nodeWidth - 1;
+    const x = which === 0 ? 1 : used - nodeWidth - 1;
     const from = { x: which === 0 ? center.x : center.x + nodeWidth, y: middle };
     const to = { x: which === 0 ? x + nodeWidth : x, y: top + NODE.height / 2 };
     return [edge(from, to, false), farNode(end, x, top, nodeWidth)];

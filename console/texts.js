@@ -104,7 +104,7 @@ const de = {
 const words = {
   en: { 0: "Unknown", 1: "Other", 2: "Enabled", 3: "Disabled", 5: "Not Applicable", 6: "Enabled but Offline", static: "set by hand",
     learned: "learned", mixed: "set by hand and learned" },
-  de: { 0: "Unbekannt", 1: "Anderer", 2: "Aktiv", 3: "Abgeschaltet", 5: "Nicht anwendbar", 6: "Aktiv, ohne Verbindung", static: "von Hand gesetzt",
+  de: { 0: "Unbekannt", 1: "Anderer", 2: "Aktiv", 3: "Abgeschaltet", 5: "Nicht anwendbar", 6: "Aktiv, offline", static: "von Hand gesetzt",
     learned: "gelernt", mixed: "von Hand gesetzt und gelernt" },
 };
 

@@ -102,8 +102,8 @@ function settingsTable(row) {
   const line = (name) => {
     const value = row.setting[name];
     const texts = Array.isArray(value) ? value : value ? [value] : [];
-    return h("tr", {}, h("th", { scope: "row" }, name), h("td", {}, sourceText(name, value, row.origin)),
-      h("td", {}, texts.length === 0 ? "–" : texts.map((text) => h("div", {}, text))));
+    return h("tr", {}, h("th", { scope: "row" }, name), h("td", { "data-label": t("from") }, sourceText(name, value, row.origin)),
+      h("td", { "data-label": t("value") }, texts.length === 0 ? "–" : texts.map((text) => h("div", {}, text))));
   };
   return h("table", { class: "settings" },
     h("thead", {}, h("tr", {}, [t("setting"), t("from"), t("value")].map((text) => h("th", { scope: "col" }, text)))),
