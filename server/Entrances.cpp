@@ -128,10 +128,9 @@ std::string greetingOf(const std::vector<http::Listener>& listeners, bool withHi
 }
 
 std::string pageOf(const std::vector<http::Listener>& listeners) {
-  std::string text =
-      "This is zorvacimd " ZORVA_VERSION
-      ", a CIM server: it publishes the DNS client configuration of this host.\n"
-      "Programs ask it by CIM-XML over HTTP POST (DSP0200), which a browser does not speak. These do:\n\n";
+  std::string text = "This is zorvacimd " ZORVA_VERSION
+                     ", a CIM server: it publishes the DNS client configuration of this host.\n"
+                     "Programs ask it by CIM-XML over HTTP POST (DSP0200). These do:\n\n";
   for (const std::string& each : commandsFor(listeners)) text += "  " + each + "\n";
   return text;
 }

@@ -22,7 +22,7 @@ std::vector<http::Listener> openListeners(const Config& config, bool hasUsers);
 /// The line that says where the server listens. With hints also how to send it a request.
 std::string greetingOf(const std::vector<http::Listener>& listeners, bool withHints);
 
-/// The response to GET of "/".
+/// The text of "/" for clients that are no browsers, or where there is no console.
 std::string pageOf(const std::vector<http::Listener>& listeners);
 
 }  // namespace zorva::server

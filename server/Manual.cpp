@@ -106,6 +106,11 @@ A certificate that expires within 30 days leaves a line in the log at the start 
 = `SIGTERM`, `SIGINT`
 Take no more connections, finish the requests in work, and end.
 
+## CONSOLE
+A browser that opens a URL of the server gets a page that shows the settings and changes them. The page asks the server by CIM-XML, as any
+client does, and its user needs the same rights. It logs in over HTTPS only. A client whose header `Accept` does not name text/html gets
+a text. `http.console` switches the page off.
+
 ## SERVICE MANAGER
 It takes sockets that are handed over as `sd_listen_fds`(3) has it, and tells readiness, reload and end as `sd_notify`(3) has it.
 A socket whose name is `https` (`FileDescriptorName=`) or whose port is that of `[tls]` speaks HTTPS. The others are Unix

@@ -14,7 +14,7 @@ import tempfile
 import time
 import traceback
 
-from server import PASSWORDS, Server, host, interface, large_host, usual_host
+from server import PASSWORDS, THIS_HOST, Server, host, interface, large_host, usual_host
 from webdriver import Browser
 
 HERE = pathlib.Path(__file__).resolve().parent
@@ -114,10 +114,8 @@ def apply_on_trial(browser, servers):
 # ---- Reading ----
 
 
-@case
-def overview_says_what_zorvactl_says(test):
-    server, browser = test.server(), test.browser()
-    show(browser, server.plain)
+def expect_rows_of_zorvactl(server, browser):
+    """Returns the names of the interfaces."""
     rows = browser.run("return [...document.querySelectorAll('.rows .row')].map((row) => [...row.children].map((cell) => cell.innerText.trim()));")
     shown = {row[0]: row for row in rows}
     document = json.loads(server.control("show", "--all", "--output", "json"))
@@ -125,9 +123,30 @@ def overview_says_what_zorvactl_says(test):
     for each in document["interfaces"]:
         wanted = [each["name"], each["state_word"], " ".join(each["servers"]) or "–", each["domain_name"] or "–", " ".join(each["suffixes"]) or "–"]
         expect_equal(shown[each["name"]], [*wanted, each["from"] or "–"])
+    return sorted(shown)
+
+
+@case
+def overview_says_what_zorvactl_says(test):
+    server, browser = test.server(), test.browser()
+    show(browser, server.plain)
+    expect_rows_of_zorvactl(server, browser)
     for text in ("198.51.100.2 is never asked", "vpn0 has 2001:DB8:0:7:0::53 twice", "The suffixes are from the host"):
         browser.wait_text(text)
     expect_no_complaints(browser)
+
+
+@case
+def real_host_is_shown_and_seen_to_change(test):
+    server, browser = test.server(THIS_HOST), test.browser()
+    subprocess.run(["ip", "link", "add", "lan0", "type", "veth", "peer", "name", "lan1"], check=True)
+    try:
+        show(browser, server.plain)
+        expect("lan0" in expect_rows_of_zorvactl(server, browser), "the interface is missing")
+    finally:
+        subprocess.run(["ip", "link", "delete", "lan0"], check=True)
+    browser.click_text("Refresh")
+    browser.wait("return !document.querySelector('main').innerText.includes('lan0');", "the end of the interface")
 
 
 @case

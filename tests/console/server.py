@@ -7,6 +7,7 @@ import subprocess
 
 from webdriver import free_port
 
+THIS_HOST = "this host"  # and no tree: what the network namespace has
 PASSWORDS = {"reader": "reader secret", "operator": "operator secret"}
 
 
@@ -51,7 +52,8 @@ class Server:
         self.port, self.tls_port = free_port(), free_port()
         (folder / "data").mkdir(parents=True)
         self.write_tree(tree)
-        (folder / "agent.toml").write_text('[agent]\ndata_dir = "data/"\n[tree]\nsource = "file"\nfile = "tree.json"\n')
+        source = 'source = "host"' if tree is THIS_HOST else 'source = "file"\nfile = "tree.json"'
+        (folder / "agent.toml").write_text(f'[agent]\ndata_dir = "data/"\n[tree]\n{source}\n')
         self.make_certificate()
         for name, password in PASSWORDS.items():
             role = {"reader": "read", "operator": "operate"}[name]

@@ -97,7 +97,16 @@ class Browser:
         self._call("POST", f"/element/{self.find(selector)}/click", {})
 
     def click_text(self, text, within="body"):
-        """Clicks the button or link with that text."""
+        """Clicks the button or link with that text, again if the page has just replaced it."""
+        for _ in range(3):
+            try:
+                return self._click_text(text, within)
+            except DriverError as error:
+                if "stale" not in str(error):
+                    raise
+        raise AssertionError(f"'{text}' is replaced all the time")
+
+    def _click_text(self, text, within):
         found = self.run("""const [text, within] = arguments;
           return [...document.querySelectorAll(within + ' button, ' + within + ' a, ' + within + ' summary')]
             .find((each) => each.textContent.trim() === text && each.checkVisibility()) ?? null;""", text, within)
