@@ -3,6 +3,7 @@
 #include <pthread.h>
 #include <unistd.h>
 
+#include <chrono>
 #include <stdexcept>
 #include <utility>
 
@@ -18,20 +19,21 @@
 namespace zorva::agent {
 namespace {
 
-std::shared_ptr<TreeSource> makeSourceOfHost(const Config& config) {
-  if (config.source == "file") return std::make_shared<FileSource>(config.treeFile);
+std::shared_ptr<TreeSource> makeSourceOfHost(const Config& config, int comparisons) {
+  if (config.source == "file") return std::make_shared<FileSource>(config.treeFile, comparisons);
   HostSourceOptions options;
+  options.comparisons = comparisons;
   options.includeLoopback = config.includeLoopback;
   return std::make_shared<HostSource>(options);
 }
 
-std::shared_ptr<TreeSource> makeSource(const Config& config) {
-  std::shared_ptr<TreeSource> host = makeSourceOfHost(config);
-  if (config.bmc.file.empty()) return host;
-  return std::make_shared<BmcSource>(std::move(host), config.bmc.file);
-}
-
 }  // namespace
+
+std::shared_ptr<TreeSource> makeSource(const Config& config, int comparisons) {
+  std::shared_ptr<TreeSource> host = makeSourceOfHost(config, comparisons);
+  if (config.bmc.file.empty()) return host;
+  return std::make_shared<BmcSource>(std::move(host), config.bmc.file, std::chrono::system_clock::now, comparisons);
+}
 
 Runtime& Runtime::instance() {
   static Runtime runtime;

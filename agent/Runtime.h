@@ -17,6 +17,9 @@
 
 namespace zorva::agent {
 
+/// The source that a configuration names. comparisons: of files, before they are watched.
+std::shared_ptr<TreeSource> makeSource(const Config& config, int comparisons = FileWatch::kComparisons);
+
 /// One for the process, made at its first use, destroyed when the library is unloaded. Thread-safe. A fork waits until
 /// no thread is inside, so that the child gets a consistent state.
 class Runtime {

@@ -35,6 +35,10 @@ class FileWatch {
   /// reads again, and then checks again.
   bool changed();
 
+  /// A descriptor that is readable when changed() may be true. -1 if nothing reports that: while it compares, and if
+  /// something cannot be watched.
+  int descriptor() const { return comparisonsLeft_ > 0 || blind_ ? -1 : inotify_.get(); }
+
  private:
   /// The data that identify a state of a file. A file's ctime cannot be set.
   struct State {

@@ -49,8 +49,12 @@ std::size_t copy(TreeBuilder& builder, const TreeSnapshot& tree, const Node& top
 
 }  // namespace
 
-BmcSource::BmcSource(std::shared_ptr<TreeSource> host, std::string file, Clock clock)
-    : host_(std::move(host)), file_(std::move(file)), clock_(std::move(clock)) {}
+BmcSource::BmcSource(std::shared_ptr<TreeSource> host, std::string file, Clock clock, int comparisons)
+    : host_(std::move(host)),
+      file_(std::move(file)),
+      clock_(std::move(clock)),
+      comparisons_(comparisons),
+      watch_(comparisons) {}
 
 bool BmcSource::changed() {
   // Both are asked every time, so that no events pile up in either.
@@ -61,9 +65,20 @@ bool BmcSource::changed() {
 
 void BmcSource::reopen() {
   host_->reopen();
-  watch_ = FileWatch();
+  watch_ = FileWatch(comparisons_);
   hostChanged_ = true;
   fileChanged_ = true;
+}
+
+void BmcSource::addWakers(Wakers& wakers) {
+  host_->addWakers(wakers);
+  wakers.addOrLook(watch_.descriptor());
+  if (state_.tree == nullptr || unknown_) return;
+  // What was read counts as unknown from then on, and nothing else reports that.
+  const auto end = std::chrono::seconds(state_.readAt + kBmcIntervals * state_.interval + 1);
+  const auto left = end - clock_().time_since_epoch();
+  wakers.addDeadline(std::clamp(std::chrono::ceil<std::chrono::milliseconds>(left), std::chrono::milliseconds(0),
+                                std::chrono::milliseconds(std::chrono::hours(1))));
 }
 
 bool BmcSource::isUnknown() const {

@@ -22,12 +22,15 @@ class BmcSource : public TreeSource {
  public:
   using Clock = std::function<std::chrono::system_clock::time_point()>;
 
-  BmcSource(std::shared_ptr<TreeSource> host, std::string file, Clock clock = std::chrono::system_clock::now);
+  BmcSource(std::shared_ptr<TreeSource> host, std::string file, Clock clock = std::chrono::system_clock::now,
+            int comparisons = FileWatch::kComparisons);
 
   bool changed() override;
 
   /// Throws what the other source throws.
   std::shared_ptr<const TreeSnapshot> read() override;
+
+  void addWakers(Wakers& wakers) override;
 
   void reopen() override;
 
@@ -40,6 +43,7 @@ class BmcSource : public TreeSource {
   std::shared_ptr<TreeSource> host_;
   std::string file_;
   Clock clock_;
+  int comparisons_;
   FileWatch watch_;
   bool hostChanged_ = true;
   bool fileChanged_ = true;

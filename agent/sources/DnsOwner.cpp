@@ -88,6 +88,16 @@ bool DnsOwner::changed() {
   return changed_;
 }
 
+// While the directory cannot be watched, the daemon's signals are all that reports a change.
+void DnsOwner::addWakers(Wakers& wakers) {
+  if (owner_.empty() || identity_.directory.empty()) return;
+  directoryWaker_.watch(identity_.directory);
+  directoryWaker_.changed();
+  wakers.add(directoryWaker_.descriptor());
+  // It may have changed before it was watched.
+  if (directory_.changed()) wakers.addDeadline(std::chrono::milliseconds(0));
+}
+
 void DnsOwner::askWhereStale(const std::vector<Link>& links) {
   if (owner_.empty() || asking_ || (!stale_ && !isConcernedBy(links))) return;
   // Before it is asked, so that what changes meanwhile is noticed afterwards.

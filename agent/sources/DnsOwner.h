@@ -9,10 +9,12 @@
 #include <string>
 #include <vector>
 
+#include "agent/files/DirectoryWatch.h"
 #include "agent/files/FileWatch.h"
 #include "agent/sources/DnsFacts.h"
 #include "agent/sources/Netlink.h"
 #include "agent/sources/SystemBus.h"
+#include "agent/tree/TreeSource.h"
 
 namespace zorva::agent {
 
@@ -43,6 +45,9 @@ class DnsOwner {
   /// Whether an answer or a report has come since acceptChanges(). Never blocks.
   bool changed();
   void acceptChanges() { changed_ = false; }
+
+  /// Adds what wakes a thread when the daemon's directory changes.
+  void addWakers(Wakers& wakers);
 
   /// Asks if there is something to ask for. links are those that the kernel has.
   void askWhereStale(const std::vector<Link>& links);
@@ -99,6 +104,7 @@ class DnsOwner {
 
   Identity identity_;
   FileWatch directory_{std::numeric_limits<int>::max()};  ///< by comparison: not everybody may read the directory
+  DirectoryWatch directoryWaker_;                         ///< for a thread that sleeps
   SystemBus* bus_ = nullptr;
   std::list<SystemBus::Handle> subscriptions_;
   std::list<SystemBus::Handle> calls_;

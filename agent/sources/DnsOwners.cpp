@@ -50,6 +50,17 @@ void DnsOwners::disconnect() {
   bus_.close();
 }
 
+void DnsOwners::addWakers(Wakers& wakers) {
+  if (!bus_.isOpen()) {
+    // Nothing reports when somebody listens on the socket.
+    if (bus_.wasRefused()) wakers.addDeadline(kLooksForTheUnreported);
+    return;
+  }
+  wakers.add(bus_.descriptor(), bus_.events());
+  if (bus_.hasMore()) wakers.addDeadline(std::chrono::milliseconds(0));
+  for (DnsOwner* owner : all_) owner->addWakers(wakers);
+}
+
 void DnsOwners::reopen() { disconnect(); }
 
 void DnsOwners::handleArrived() {

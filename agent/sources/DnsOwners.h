@@ -11,6 +11,7 @@
 #include "agent/sources/Networkd.h"
 #include "agent/sources/Resolved.h"
 #include "agent/sources/SystemBus.h"
+#include "agent/tree/TreeSource.h"
 
 namespace zorva::agent {
 
@@ -35,6 +36,9 @@ class DnsOwners {
   /// Asks those that may have something new to say, and waits for them. Who does not answer in time is not waited for
   /// again until it has answered; what it said before holds meanwhile.
   void look(const std::vector<Link>& links);
+
+  /// Adds what wakes a thread when changed() may be true.
+  void addWakers(Wakers& wakers);
 
   void reopen();
 

@@ -6,7 +6,8 @@
 
 namespace zorva::agent {
 
-FileSource::FileSource(std::string path) : path_(std::move(path)) {}
+FileSource::FileSource(std::string path, int comparisons)
+    : path_(std::move(path)), comparisons_(comparisons), watch_(comparisons) {}
 
 bool FileSource::changed() { return watch_.changed(); }
 
@@ -15,6 +16,8 @@ std::shared_ptr<const TreeSnapshot> FileSource::read() {
   return treeFromJsonValue(readJsonFile(path_), path_);
 }
 
-void FileSource::reopen() { watch_ = FileWatch(); }
+void FileSource::addWakers(Wakers& wakers) { wakers.addOrLook(watch_.descriptor()); }
+
+void FileSource::reopen() { watch_ = FileWatch(comparisons_); }
 
 }  // namespace zorva::agent

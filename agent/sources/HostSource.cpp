@@ -1,5 +1,6 @@
 #include "agent/sources/HostSource.h"
 
+#include <fcntl.h>
 #include <linux/if.h>
 
 #include <unordered_map>
@@ -61,6 +62,14 @@ void HostSource::reopen() {
   watch_ = FileWatch(options_.comparisons);
   reader_.close();
   owners_.reopen();
+}
+
+void HostSource::addWakers(Wakers& wakers) {
+  if (!nodeNameFile_) nodeNameFile_ = util::FileDescriptor(::open("/proc/sys/kernel/hostname", O_RDONLY | O_CLOEXEC));
+  wakers.add(nodeNameFile_.get(), POLLPRI);
+  wakers.addOrLook(monitor_.descriptor());
+  wakers.addOrLook(unread_ ? -1 : watch_.descriptor());
+  owners_.addWakers(wakers);
 }
 
 // Called before anything is read, so that changes during the reading are reported afterwards.

@@ -9,6 +9,7 @@
 #include "agent/sources/HostNames.h"
 #include "agent/sources/Netlink.h"
 #include "agent/tree/TreeSource.h"
+#include "util/FileDescriptor.h"
 #include "util/ReadFile.h"
 
 namespace zorva::agent {
@@ -35,6 +36,8 @@ class HostSource : public TreeSource {
 
   /// Throws std::runtime_error, with one line, if the kernel cannot be queried.
   std::shared_ptr<const TreeSnapshot> read() override;
+
+  void addWakers(Wakers& wakers) override;
 
   void reopen() override;
 
@@ -73,8 +76,9 @@ class HostSource : public TreeSource {
   DnsOwners owners_;
   FileWatch watch_;
   bool watching_ = false;
-  bool filesMoved_ = true;  ///< the ways to the files must be followed again
-  bool unread_ = false;     ///< a file could not be read for a temporary reason
+  bool filesMoved_ = true;             ///< the ways to the files must be followed again
+  bool unread_ = false;                ///< a file could not be read for a temporary reason
+  util::FileDescriptor nodeNameFile_;  ///< the kernel reports changes of the host's name there
   std::string nodeName_;
   std::string product_;  ///< empty until it is read
 };

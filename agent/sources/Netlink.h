@@ -44,6 +44,9 @@ class LinkMonitor {
   /// Whether there was an event since the last check, or events may have been lost. Never blocks.
   bool changed();
 
+  /// Readable when there is an event; -1 if there is no socket.
+  int descriptor() const { return socket_ == nullptr ? -1 : ::mnl_socket_get_fd(socket_.get()); }
+
  private:
   NetlinkSocket socket_;
 };

@@ -184,6 +184,8 @@ bool SystemBus::handleArrived() {
   return result >= 0;
 }
 
+short SystemBus::events() const { return static_cast<short>(::sd_bus_get_events(bus_)); }
+
 void SystemBus::wait(std::chrono::microseconds longest) {
   ::sd_bus_wait(bus_, static_cast<std::uint64_t>(longest.count()));
 }

@@ -167,6 +167,11 @@ class SystemBus {
   /// handler throws comes out here.
   bool handleArrived();
 
+  /// What to wait for in poll(2), unless there is more to do at once.
+  int descriptor() const { return descriptor_; }
+  short events() const;
+  bool hasMore() const { return hasMore_; }
+
   /// Waits until something has arrived, at most so long.
   void wait(std::chrono::microseconds longest);
 

@@ -62,11 +62,15 @@ bool canBeSet(PropertyNumber property, const PropertyValue& value);
 /// Follows the changes of a data directory's overlay. Belongs to one thread at a time.
 class OverlayReader {
  public:
-  explicit OverlayReader(const std::string& dataDir) : overlay_(dataDir) {}
+  explicit OverlayReader(const std::string& dataDir, int comparisons = FileWatch::kComparisons)
+      : overlay_(dataDir), watch_(comparisons) {}
 
   /// Whether the file may have changed since the last read, or could not be read then for a temporary reason; true
   /// before the first read. Never blocks.
   bool changed() { return watch_.changed() || unreadable_; }
+
+  /// As that of a FileWatch.
+  int descriptor() const { return unreadable_ ? -1 : watch_.descriptor(); }
 
   /// Reads the file. A wrong file is logged and counts as empty, so that the host's own values can still be read. If it
   /// cannot be read for a temporary reason, that is logged once, and the previous values are used meanwhile.
