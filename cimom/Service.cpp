@@ -237,6 +237,7 @@ class ServiceCore {
           {},      record};
       const Status status = carryOutSafely(operation);
       audit(std::move(record), status);
+      if (options_.operationEnded) options_.operationEnded(call.name, static_cast<int>(status.rc));
       if (!status.ok()) {
         log(LogLevel::Info,
             call.name + " in " + broker::quotedText(call.target.nameSpace.substr(0, 200)) + ": " + statusText(status));

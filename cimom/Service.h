@@ -25,6 +25,8 @@ struct ServiceOptions {
   broker::LogHook log;
   /// Takes a record of each change, done or not, and of each refusal. May be empty.
   access::AuditHook audit;
+  /// Takes the name and the CIM status of each operation that was carried out. May be empty.
+  std::function<void(const std::string& operation, int status)> operationEnded;
 
   std::size_t maxDepth = 128;       ///< the deepest nesting of elements in a request
   std::size_t maxOperations = 100;  ///< the most operations in one multiple request

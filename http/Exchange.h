@@ -70,4 +70,19 @@ class ResponseSink {
   virtual bool begun() const = 0;
 };
 
+/// A response that goes on until its client or the server ends it. Thread-safe.
+class Stream {
+ public:
+  virtual ~Stream() = default;
+
+  /// The header fields of the response, Content-Type among them; call it once, first.
+  virtual void beginStream(const HeaderList& headers) = 0;
+
+  /// Sends more of it. Never waits. False: it is over, because the client is gone or does not read what came before.
+  virtual bool offer(std::string_view text) = 0;
+
+  /// Ends it.
+  virtual void end() = 0;
+};
+
 }  // namespace zorva::http

@@ -115,6 +115,35 @@ void HttpExchange::finish(const Refusal& orElse) {
   complete();
 }
 
+void HttpExchange::beginStream(const HeaderList& headers) {
+  begin(200, headers);
+  // What a client waits for must not wait in a compressor.
+  takesGzip = false;
+}
+
+bool HttpExchange::offer(std::string_view text) {
+  const std::lock_guard lock(mutex_);
+  if (gone_ || givenUp_ || complete_) return false;
+  if (text.size() > kMostHeld - std::min(held_.size(), kMostHeld)) {
+    failed_ = true;
+    complete();
+    return false;
+  }
+  append(text);
+  streaming_ ? wake() : startStreaming();
+  return true;
+}
+
+void HttpExchange::end() {
+  const std::lock_guard lock(mutex_);
+  if (!gone_ && !complete_) complete();
+}
+
+bool HttpExchange::wasGivenUp() const {
+  const std::lock_guard lock(mutex_);
+  return givenUp_;
+}
+
 void HttpExchange::append(std::string_view text) {
   if (gzip_ != nullptr) {
     gzip_->add(text, held_);

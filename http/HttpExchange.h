@@ -38,7 +38,7 @@ class WaitListener {
   virtual void goesOn() = 0;
 };
 
-class HttpExchange final : public ResponseSink, public std::enable_shared_from_this<HttpExchange> {
+class HttpExchange final : public ResponseSink, public Stream, public std::enable_shared_from_this<HttpExchange> {
  public:
   using Clock = std::chrono::steady_clock;
 
@@ -54,6 +54,8 @@ class HttpExchange final : public ResponseSink, public std::enable_shared_from_t
   bool awaitsLogin = false;  ///< decide() will be called; used by the event thread
   bool takesGzip = false;
   bool isHttp11 = true;
+  bool isStream = false;
+  int refusedWith = 0;  ///< the status of a response that was sent without respond()
   const std::shared_ptr<Connection> client;
 
   // ---- The event thread ----
@@ -93,6 +95,15 @@ class HttpExchange final : public ResponseSink, public std::enable_shared_from_t
   void setLateAnswer(LateAnswer answer) override;
   bool isWanted() const override;
 
+  // ---- Of a stream, on any thread ----
+
+  /// No more than kMostHeld is unsent.
+  void beginStream(const HeaderList& headers) override;
+  bool offer(std::string_view text) override;
+  void end() override;
+
+  // ---- The worker ----
+
   /// The work is done. If it wrote nothing, `orElse` is the response.
   void finish(const Refusal& orElse);
 
@@ -110,6 +121,9 @@ class HttpExchange final : public ResponseSink, public std::enable_shared_from_t
   /// True if the work waits for something other than its client: it has run for a while and its thread has used almost
   /// no processor time for it, or it has run for long.
   bool hangs() const;
+
+  /// Whether it was abandoned.
+  bool wasGivenUp() const;
 
   /// Abandons the work. If nothing of a response was sent yet, the late answer that was set is the response, else
   /// `orElse`. Later results are dropped. False: the work was done.

@@ -134,9 +134,11 @@ class HttpServer::Core {
   void setTls(std::shared_ptr<const TlsIdentity> identity);
   void setHostNames(const std::vector<std::string>& names);
   void setAudit(access::AuditHook audit) { audit_ = std::move(audit); }
+  void setRequestHook(RequestHook hook) { requestHook_ = std::move(hook); }
   void setLimits(const HttpLimits& limits);
   void sweep();
   bool hasWork() const;
+  std::size_t streams() const { return streamCount_.load(std::memory_order_relaxed); }
   bool stop();
 
   std::size_t connectionCount() const { return connections_.count(); }
@@ -165,6 +167,9 @@ class HttpServer::Core {
   void releaseBody(HttpExchange& exchange);
   bool answersAtOnce(HttpExchange& exchange) const;
   MHD_Result requestIsWhole(const Holder& exchange, MHD_Connection* connection);
+  void startStream(const Holder& exchange);
+  void endStreams();
+  void report(const HttpExchange& exchange) const;
   static MHD_Result respond(HttpExchange& exchange, MHD_Connection* connection);
   void logRefusal(const HttpExchange& exchange, const Refusal& refusal) const;
   void logAnswer(const HttpExchange& exchange) const;
@@ -185,6 +190,11 @@ class HttpServer::Core {
   Workers workers_;
   LoginQueue logins_;
   access::AuditHook audit_;
+  RequestHook requestHook_;
+  std::mutex streamsMutex_;
+  std::vector<std::weak_ptr<HttpExchange>> streams_;
+  bool takesStreams_ = true;
+  std::atomic<std::size_t> streamCount_ = 0;
   std::atomic<std::size_t> bodies_ = 0;  ///< bytes of unfinished requests
   std::atomic<std::size_t> requests_ = 0;
   MHD_Daemon* daemon_ = nullptr;
@@ -240,6 +250,7 @@ MHD_Daemon* HttpServer::Core::startDaemon(Door door) const {
 }
 
 HttpServer::Core::~Core() {
+  endStreams();
   workers_.giveUpAll();
   logins_.giveUpAll();
   stopDaemons();
@@ -313,8 +324,8 @@ void HttpServer::Core::sweep() {
 }
 
 bool HttpServer::Core::hasWork() const {
-  return workers_.inFlight() > 0 || connections_.countIn(Phase::Working) > 0 ||
-         connections_.countIn(Phase::Sending) > 0;
+  return workers_.inFlight() > 0 ||
+         connections_.countIn(Phase::Working) + connections_.countIn(Phase::Sending) > streams();
 }
 
 bool HttpServer::Core::stop() {
@@ -324,6 +335,7 @@ bool HttpServer::Core::stop() {
   const auto waitUntil = [&](Clock::time_point deadline) {
     while (hasWork() && Clock::now() < deadline) std::this_thread::sleep_for(kStep);
   };
+  endStreams();
   // A client that is not known yet has no request in work.
   logins_.giveUpAll();
   waitUntil(Clock::now() + limits().drain);
@@ -405,6 +417,7 @@ MHD_Result HttpServer::Core::readHead(Holder& exchange, MHD_Connection* connecti
   if (const auto refusal = checkRequest(connection, *exchange, version)) {
     logRefusal(*exchange, *refusal);
     exchange->client->enter(Phase::Sending);
+    exchange->refusedWith = refusal->status;
     return respondWith(connection, *refusal);
   }
   exchange->takesGzip = limits().gzip && listHas(request.headers, "Accept-Encoding", "gzip");
@@ -489,6 +502,7 @@ MHD_Result HttpServer::Core::loginIsDecided(HttpExchange& exchange, MHD_Connecti
   exchange.client->enter(refusal ? Phase::Sending : Phase::Arriving);
   if (!refusal) return MHD_YES;
   logRefusal(exchange, *refusal);
+  exchange.refusedWith = refusal->status;
   return respondWith(connection, *refusal);
 }
 
@@ -532,12 +546,44 @@ MHD_Result HttpServer::Core::requestIsWhole(const Holder& exchange, MHD_Connecti
   if (answersAtOnce(*exchange)) return respond(*exchange, connection);
   exchange->client->enter(Phase::Working);
   exchange->suspend();
+  if (!exchange->refusal.has_value() && exchange->page != nullptr && exchange->page->stream) {
+    startStream(exchange);
+    return MHD_YES;
+  }
   if (!exchange->refusal.has_value()) exchange->refusal = workers_.submit(exchange, connections_);
   if (exchange->refusal.has_value()) {
     logRefusal(*exchange, *exchange->refusal);
     exchange->finish(*exchange->refusal);
   }
   return MHD_YES;
+}
+
+void HttpServer::Core::startStream(const Holder& exchange) {
+  if (exchange->request.method == MHD_HTTP_METHOD_HEAD) {
+    exchange->begin(200, {});
+    return exchange->finish({});
+  }
+  const std::lock_guard lock(streamsMutex_);
+  std::string problem = "the server is ending";
+  if (takesStreams_) problem = exchange->page->stream(exchange->request, exchange);
+  if (!problem.empty()) {
+    exchange->refusal = Refusal{503, std::move(problem), {}};
+    logRefusal(*exchange, *exchange->refusal);
+    return exchange->finish(*exchange->refusal);
+  }
+  exchange->isStream = true;
+  std::erase_if(streams_, [](const auto& each) { return each.expired(); });
+  streams_.push_back(exchange);
+  ++streamCount_;
+}
+
+/// The HTTP library must not be stopped while connections are suspended.
+void HttpServer::Core::endStreams() {
+  const std::lock_guard lock(streamsMutex_);
+  takesStreams_ = false;
+  for (const auto& each : streams_) {
+    if (const auto exchange = each.lock()) exchange->end();
+  }
 }
 
 MHD_Result HttpServer::Core::respond(HttpExchange& exchange, MHD_Connection* connection) {
@@ -553,6 +599,8 @@ void HttpServer::Core::onCompleted(void* self, MHD_Connection*, void** holder, M
   Core& core = *static_cast<Core*>(self);
   (*exchange)->ended();
   core.releaseBody(**exchange);
+  if ((*exchange)->isStream) --core.streamCount_;
+  if (code == MHD_REQUEST_TERMINATED_COMPLETED_OK || (*exchange)->isStream) core.report(**exchange);
   if (code == MHD_REQUEST_TERMINATED_COMPLETED_OK) {
     (*exchange)->client->prove();
     core.logAnswer(**exchange);
@@ -561,6 +609,14 @@ void HttpServer::Core::onCompleted(void* self, MHD_Connection*, void** holder, M
   }
   (*exchange)->client->enter(Phase::Idle);
   delete exchange;
+}
+
+void HttpServer::Core::report(const HttpExchange& exchange) const {
+  const int status = exchange.status() != 0 ? exchange.status() : exchange.refusedWith;
+  if (!requestHook_ || status == 0) return;
+  const auto time = HttpExchange::Clock::now() - exchange.arrived();
+  requestHook_({status, exchange.page != nullptr, exchange.isStream, exchange.wasGivenUp(),
+                std::chrono::duration_cast<std::chrono::microseconds>(time)});
 }
 
 void HttpServer::Core::logRefusal(const HttpExchange& exchange, const Refusal& refusal) const {
@@ -608,11 +664,19 @@ void HttpServer::setHostNames(const std::vector<std::string>& names) { core_->se
 
 void HttpServer::setAudit(access::AuditHook audit) { core_->setAudit(std::move(audit)); }
 
+void HttpServer::setRequestHook(RequestHook hook) { core_->setRequestHook(std::move(hook)); }
+
 void HttpServer::setLimits(const HttpLimits& limits) { core_->setLimits(limits); }
 
 void HttpServer::sweep() { core_->sweep(); }
 
-bool HttpServer::isBusy() const { return core_->connectionCount() > 0 || core_->inFlight() > 0; }
+bool HttpServer::isBusy() const { return core_->connectionCount() > core_->streams() || core_->inFlight() > 0; }
+
+std::size_t HttpServer::streams() const { return core_->streams(); }
+
+std::size_t HttpServer::connections() const { return core_->connectionCount(); }
+
+std::size_t HttpServer::requestsInWork() const { return core_->inFlight(); }
 
 std::size_t HttpServer::requestsTaken() const { return core_->requestsTaken(); }
 

@@ -24,6 +24,18 @@
 
 namespace zorva::http {
 
+/// A request whose response was sent, or that was a stream.
+struct RequestEnd {
+  int status = 0;
+  bool isForPage = false;
+  bool isStream = false;
+  bool isLate = false;  ///< its handler did not return in time
+  std::chrono::microseconds time{};
+};
+
+/// Called on event threads, so it must not wait.
+using RequestHook = std::function<void(const RequestEnd&)>;
+
 class HttpServer : util::NotCopied {
  public:
   /// Answers a request; called on worker threads, on several at once.
@@ -58,14 +70,23 @@ class HttpServer : util::NotCopied {
   /// Call it before take().
   void setAudit(access::AuditHook audit);
 
+  /// Takes the end of each request. Call it before take().
+  void setRequestHook(RequestHook hook);
+
   /// The limits for requests from now on; the size of headers does not change.
   void setLimits(const HttpLimits& limits);
 
   /// Cuts off overdue connections and requests. Call it several times a second while isBusy().
   void sweep();
 
-  /// Whether there is any connection or request.
+  /// Whether there is any connection or request. Streams do not count.
   bool isBusy() const;
+
+  /// How many streams there are. While there is any, call sweep() every few seconds.
+  std::size_t streams() const;
+
+  std::size_t connections() const;
+  std::size_t requestsInWork() const;
 
   /// How many requests have been taken so far.
   std::size_t requestsTaken() const;

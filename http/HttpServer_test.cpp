@@ -542,6 +542,129 @@ TEST(HttpServer, APageIsPublicOrForClientsThatTheGateLetsIn) {
   EXPECT_EQ(wire.receive().status, 401);
 }
 
+const std::string kWatch = "GET /watch HTTP/1.1\r\nHost: localhost\r\nAccept-Encoding: gzip\r\n\r\n";
+
+/// A page that keeps its streams.
+class Streams {
+ public:
+  Page page() {
+    return {{}, false, [this](const HttpRequest&, const std::shared_ptr<Stream>& stream) {
+              const std::lock_guard lock(mutex_);
+              if (isFull_) return std::string("too many watch");
+              stream->beginStream({{"Content-Type", "application/x-ndjson"}});
+              stream->offer("first\n");
+              stream_ = stream;
+              arrived_.open();
+              return std::string();
+            }};
+  }
+  std::shared_ptr<Stream> next() {
+    arrived_.wait();
+    const std::lock_guard lock(mutex_);
+    return stream_;
+  }
+  void fill() { isFull_ = true; }
+
+ private:
+  std::mutex mutex_;
+  Gate arrived_;
+  std::shared_ptr<Stream> stream_;
+  std::atomic<bool> isFull_ = false;
+};
+
+TEST(HttpServer, AStreamGetsWhatIsOfferedAndNeedsNoWorker) {
+  HttpLimits limits;
+  limits.workers = 1;
+  limits.provider = milliseconds(300);
+  Streams streams;
+  Server server(echo, limits, {{"/watch", streams.page()}});
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send(kWatch));
+  const std::shared_ptr<Stream> stream = streams.next();
+  EXPECT_THAT(wire.take(4096, milliseconds(500)), HasSubstr("first\n"));
+  EXPECT_EQ(server.http().streams(), 1U);
+  Wire other(server.port());
+  ASSERT_TRUE(other.send(testing::posting("x")));
+  EXPECT_EQ(other.receive().body, "x");
+  EXPECT_TRUE(stream->offer("second\n"));
+  EXPECT_THAT(wire.take(4096, milliseconds(500)), HasSubstr("second\n"));
+  stream->end();
+  EXPECT_THAT(wire.take(4096, milliseconds(500)), HasSubstr("0\r\n"));
+  EXPECT_FALSE(stream->offer("third\n"));
+  streams.fill();
+  ASSERT_TRUE(other.send(kWatch));
+  EXPECT_EQ(other.receive().status, 503);
+}
+
+TEST(HttpServer, AStreamIsOverWhenItsClientReadsNothing) {
+  Streams streams;
+  Server server(echo, {}, {{"/watch", streams.page()}});
+  Wire wire(server.port(), 4096);
+  ASSERT_TRUE(wire.send(kWatch));
+  const std::shared_ptr<Stream> stream = streams.next();
+  std::size_t taken = 0;
+  while (stream->offer(longText(30'000)) && taken < (std::size_t{64} << 20)) taken += 30'000;
+  EXPECT_LT(taken, std::size_t{64} << 20) << "what is not read is not kept for ever";
+}
+
+TEST(HttpServer, AStreamIsOverWhenItsClientLeaves) {
+  Streams streams;
+  Server server(echo, {}, {{"/watch", streams.page()}});
+  std::shared_ptr<Stream> stream;
+  {
+    Wire wire(server.port());
+    ASSERT_TRUE(wire.send(kWatch));
+    stream = streams.next();
+  }
+  const auto deadline = std::chrono::steady_clock::now() + seconds(20);
+  bool goesOn = true;
+  while (goesOn && std::chrono::steady_clock::now() < deadline) {
+    goesOn = stream->offer("more\n");
+    std::this_thread::sleep_for(milliseconds(5));
+  }
+  EXPECT_FALSE(goesOn);
+  while (server.http().streams() > 0 && std::chrono::steady_clock::now() < deadline) {
+    std::this_thread::sleep_for(milliseconds(5));
+  }
+  EXPECT_EQ(server.http().streams(), 0U);
+}
+
+TEST(HttpServer, TheEndOfTheServerEndsStreams) {
+  Streams streams;
+  Server server(echo, {}, {{"/watch", streams.page()}});
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send(kWatch));
+  const std::shared_ptr<Stream> stream = streams.next();
+  EXPECT_TRUE(server.http().stop());
+  EXPECT_FALSE(stream->offer("more\n"));
+}
+
+TEST(HttpServer, TheEndOfEachRequestIsReported) {
+  std::mutex mutex;
+  std::vector<RequestEnd> ends;
+  Gate both;
+  Server server(echo, {}, {{"/x", textPage("a page")}});
+  server.http().setRequestHook([&](const RequestEnd& end) {
+    const std::lock_guard lock(mutex);
+    ends.push_back(end);
+    if (ends.size() == 3) both.open();
+  });
+  Wire wire(server.port());
+  ASSERT_TRUE(wire.send(testing::posting("x")));
+  wire.receive();
+  ASSERT_TRUE(wire.send("GET /x HTTP/1.1\r\nHost: localhost\r\n\r\n"));
+  wire.receive();
+  ASSERT_TRUE(wire.send("GET /nonesuch HTTP/1.1\r\nHost: localhost\r\n\r\n"));
+  wire.receive();
+  both.wait();
+  EXPECT_EQ(ends[0].status, 200);
+  EXPECT_FALSE(ends[0].isForPage);
+  EXPECT_GT(ends[0].time.count(), 0);
+  EXPECT_EQ(ends[1].status, 200);
+  EXPECT_TRUE(ends[1].isForPage);
+  EXPECT_EQ(ends[2].status, 405);
+}
+
 TEST(HttpServer, ARequestByPostIsNoRequestForAPage) {
   Server server(echo, {}, {{"/x", textPage("a page")}});
   Wire wire(server.port());

@@ -14,7 +14,8 @@ Page textPage(std::string text) {
             sink.begin(200, {{"Content-Type", "text/plain; charset=utf-8"}});
             sink.write(text);
           },
-          true};
+          true,
+          {}};
 }
 
 }  // namespace zorva::http

@@ -4,6 +4,7 @@
 
 #include <functional>
 #include <map>
+#include <memory>
 #include <string>
 #include <string_view>
 
@@ -18,6 +19,10 @@ struct Page {
   /// Shown to everybody: nobody asks who the client is, and the thread of the connection answers, so it must not wait.
   /// Any other page is for clients that the gate lets in, whom HttpRequest::who names, and is answered by a worker.
   bool isPublic = false;
+
+  /// Instead of `answer`: the response to GET, which the function keeps. It needs no worker meanwhile. Called on the
+  /// thread of the connection, so it must not wait. Returns a sentence if there is no room for another one.
+  std::function<std::string(const HttpRequest&, const std::shared_ptr<Stream>&)> stream = {};
 };
 
 /// By path, without a query.

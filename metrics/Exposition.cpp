@@ -96,4 +96,6 @@ void Exposition::single(std::string_view name, Type type, std::string_view help,
   sample({}, value);
 }
 
+void Exposition::append(const Exposition& other) { text_ += other.text_; }
+
 }  // namespace zorva::metrics

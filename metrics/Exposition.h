@@ -35,6 +35,9 @@ class Exposition {
   /// A family with one sample, which has no labels.
   void single(std::string_view name, Type type, std::string_view help, double value);
 
+  /// The text of another one, whole.
+  void append(const Exposition& other);
+
   const std::string& text() const noexcept { return text_; }
 
  private:

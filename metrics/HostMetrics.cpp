@@ -125,6 +125,8 @@ void writeResolver(Exposition& out, const TreeSnapshot& tree) {
   });
 }
 
+}  // namespace
+
 void writeServiceProcessors(Exposition& out, const TreeSnapshot& tree, std::uint64_t now) {
   constexpr std::size_t kMostSystems = 64;
   const auto write = [&](auto valueOf) {
@@ -142,9 +144,7 @@ void writeServiceProcessors(Exposition& out, const TreeSnapshot& tree, std::uint
   write([](const Node& system, unsigned int) { return system.text(agent::kReadProblem) == nullptr ? 0.0 : 1.0; });
 }
 
-}  // namespace
-
-void writeTree(Exposition& out, const agent::TreeSnapshot& tree, std::uint64_t now) {
+void writeTree(Exposition& out, const agent::TreeSnapshot& tree) {
   const Interfaces interfaces = interfacesOf(tree);
   const std::size_t serversLeftOut = writeServers(out, interfaces);
   out.family("zorva_dns_servers", Type::Gauge, "DNS servers of an interface.");
@@ -153,7 +153,6 @@ void writeTree(Exposition& out, const agent::TreeSnapshot& tree, std::uint64_t n
   writeSizes(out, interfaces, PROP_DNS_SUFFIXES);
   writeStates(out, interfaces);
   writeResolver(out, tree);
-  writeServiceProcessors(out, tree, now);
   out.family("zorva_metrics_left_out", Type::Gauge, "What is beyond the limits of a scrape and has no series.");
   out.sample({{"what", "interfaces"}}, static_cast<double>(interfaces.leftOut));
   out.sample({{"what", "servers"}}, static_cast<double>(serversLeftOut));

@@ -16,9 +16,12 @@ inline constexpr std::size_t kMostInterfaces = 10'000;
 inline constexpr std::size_t kMostServersOfInterface = 16;
 inline constexpr std::size_t kMostServers = 50'000;
 
-/// Interfaces with state, suffixes and servers in search order; the host's resolver; the service processor. `now` is in
-/// seconds since 1970. Of interfaces with one name, the first counts.
-void writeTree(Exposition& out, const agent::TreeSnapshot& tree, std::uint64_t now);
+/// Interfaces with state, suffixes and servers in search order, and the host's resolver. Of interfaces with one name,
+/// the first counts.
+void writeTree(Exposition& out, const agent::TreeSnapshot& tree);
+
+/// When the service processors were read. `now` is in seconds since 1970.
+void writeServiceProcessors(Exposition& out, const agent::TreeSnapshot& tree, std::uint64_t now);
 
 void writeDrift(Exposition& out, const std::vector<agent::SettingsDrift>& drifts);
 

@@ -44,7 +44,9 @@ class HostMetricsTest : public ::testing::Test {
 
   std::string treeText(const std::string& systems, std::uint64_t now = 1000) {
     Exposition out;
-    writeTree(out, *tree(systems), now);
+    const auto read = tree(systems);
+    writeTree(out, *read);
+    writeServiceProcessors(out, *read, now);
     return out.text();
   }
 
@@ -93,21 +95,23 @@ TEST_F(HostMetricsTest, HaveOneSeriesForInterfacesOfOneName) {
             text.rfind("zorva_dns_servers{system=\"host\",interface=\"eth0\"}"));
 }
 
-TEST_F(HostMetricsTest, LeaveOutWhatIsBeyondTheLimits) {
-  std::string many;
-  for (std::size_t i = 0; i < kMostServersOfInterface + 3; ++i) {
-    many += (i == 0 ? "\"" : ", \"") + ("192.0.2." + std::to_string(i)) + "\"";
-  }
-  std::string ports = port("first", R"("name": "first", "dns_server_addresses": [)" + many + "]");
-  for (std::size_t i = 0; i <= kMostInterfaces; ++i) {
+TEST(HostMetrics, LeaveOutWhatIsBeyondTheLimits) {
+  const auto servers = std::make_shared<const agent::StringList>(kMostServersOfInterface + 3, "192.0.2.1");
+  agent::TreeBuilder builder("host1");
+  const std::size_t system = builder.add(0, agent::NodeType::System, "system", "Computer");
+  for (std::size_t i = 0; i < kMostInterfaces + 2; ++i) {
     const std::string name = "i" + std::to_string(i);
-    ports += ", " + port(name, "\"name\": \"" + name + "\", \"dns_server_addresses\": [" + many + "]");
+    const std::size_t port = builder.add(system, agent::NodeType::Port, name);
+    const std::size_t node = builder.add(port, agent::NodeType::NetworkIPConfig, "ip");
+    builder.set(node, ZV::NodeLexicon::PROP_NAME, name);
+    builder.set(node, ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES, servers);
   }
-  const std::string text = treeText(system("system", "Computer", "", ports));
-  EXPECT_THAT(text, HasSubstr("zorva_metrics_left_out{what=\"interfaces\"} 2\n"));
-  const std::size_t servers = kMostInterfaces * (kMostServersOfInterface + 3) - kMostServers;
-  EXPECT_THAT(text, HasSubstr("zorva_metrics_left_out{what=\"servers\"} " + std::to_string(servers) + "\n"));
-  EXPECT_LT(text.size(), std::size_t{16} << 20);
+  Exposition out;
+  writeTree(out, *builder.finish());
+  EXPECT_THAT(out.text(), HasSubstr("zorva_metrics_left_out{what=\"interfaces\"} 2\n"));
+  const std::size_t leftOut = kMostInterfaces * (kMostServersOfInterface + 3) - kMostServers;
+  EXPECT_THAT(out.text(), HasSubstr("zorva_metrics_left_out{what=\"servers\"} " + std::to_string(leftOut) + "\n"));
+  EXPECT_LT(out.text().size(), std::size_t{16} << 20);
 }
 
 TEST_F(HostMetricsTest, SayWhereTheHostDiffersFromTheFileOfAnInterface) {

@@ -135,6 +135,18 @@ void readAccess(Config& config, const util::TomlDocument& document) {
   config.access.usersFile = util::pathFrom(config.file, config.access.usersFile);
 }
 
+void readMetrics(Config& config, const util::TomlDocument& document) {
+  util::TomlTable metrics(document, "metrics");
+  metrics.take("check_interval", config.checkSeconds);
+  metrics.finish();
+}
+
+void readWatch(Config& config, const util::TomlDocument& document) {
+  util::TomlTable watch(document, "watch");
+  watch.take("clients", config.watchers);
+  watch.finish();
+}
+
 void readLog(Config& config, const util::TomlDocument& document) {
   util::TomlTable log(document, "log");
   log.take("level", config.logLevel);
@@ -170,6 +182,8 @@ Config parseConfig(const std::string& path, const std::string& text) try {
   readAgent(config, document);
   readAccess(config, document);
   readAudit(config, document);
+  readMetrics(config, document);
+  readWatch(config, document);
   readLog(config, document);
   return config;
 } catch (const util::TomlError& error) {

@@ -62,6 +62,12 @@ struct Config {
   /// [audit]
   std::string auditFile;  ///< empty: the audit's lines are in the log
 
+  /// [metrics]
+  int checkSeconds = 0;  ///< between two questions to each DNS server; 0: none is asked
+
+  /// [watch]
+  int watchers = 32;  ///< clients that watch at once
+
   /// [log]
   int logLevel = util::kLevelWarning;    ///< lines below it are dropped
   std::optional<std::string> logTarget;  ///< absent: the agent's default

@@ -269,6 +269,28 @@ constexpr TomlKey kAudit[] = {
      .meaning = "The file of these lines. Empty: they are among the lines of the log."},
 };
 
+constexpr TomlKey kMetrics[] = {
+    {.name = "check_interval",
+     .type = TomlType::Number,
+     .standard = "0",
+     .example = "60",
+     .meaning = "How often, in seconds, each DNS server of this host is asked a question for these values; 0: never. A "
+                "thread of its own asks, and no scrape waits for it.",
+     .least = 0,
+     .most = kLongestSeconds},
+};
+
+constexpr TomlKey kWatch[] = {
+    {.name = "clients",
+     .type = TomlType::Number,
+     .standard = "32",
+     .example = "4",
+     .meaning = "Clients that watch at once, as `zorvactl watch` does with a server. One more gets the status 503. 0: "
+                "nobody may.",
+     .least = 0,
+     .most = 1000},
+};
+
 constexpr TomlKey kLog[] = {
     {.name = "level",
      .type = TomlType::Number,
@@ -299,6 +321,8 @@ constexpr util::TomlSection kSections[] = {
     {"agent", "The agent and the providers.", kAgent},
     {"access", "Who may do what: `read`, `operate` (also changes and methods) or `none`.", kAccess},
     {"audit", "A line for each change that a client makes or tries, and for each refusal.", kAudit},
+    {"metrics", "What Prometheus reads at `/metrics`.", kMetrics},
+    {"watch", "Changes of the host, which the server reports at `/watch` as they happen.", kWatch},
     {"log", "The log.", kLog},
 };
 

@@ -38,6 +38,7 @@
 #include "server/ConsolePages.h"
 #include "server/Entrances.h"
 #include "server/MakeCertificate.h"
+#include "server/MetricsPage.h"
 #include "server/SettingOrigins.h"
 #include "server/Systemd.h"
 #include "util/FileDescriptor.h"
@@ -125,8 +126,9 @@ void mendSettings() noexcept {
 }
 
 /// What GET returns.
-http::Pages pagesOf(const Config& config, const std::vector<http::Listener>& listeners) {
+http::Pages pagesOf(const Config& config, const std::vector<http::Listener>& listeners, MetricsPage& metrics) {
   http::Pages pages;
+  pages.emplace("/metrics", metrics.page());
   pages.emplace("/", http::textPage(pageOf(listeners)));
   if (config.hasConsole) addConsole(pages);
   return pages;
@@ -163,6 +165,7 @@ class Daemon {
   std::unique_ptr<AuditLog> audit_;  ///< outlives what writes to it
   util::FileDescriptor signals_;
   std::vector<http::Listener> listeners_;
+  MetricsPage metrics_;  ///< outlives what counts in it
   std::unique_ptr<broker::Broker> broker_;
   std::unique_ptr<cimom::Service> service_;
   std::shared_ptr<access::LoginGate> gate_;
@@ -189,6 +192,9 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
   broker_ = makeBroker(config_);
   cimom::ServiceOptions options = serviceOptions(config_);
   options.audit = [this](const access::AuditRecord& record) { audit_->take(record); };
+  options.operationEnded = [this](const std::string& operation, int status) {
+    metrics_.counters().operationEnded(operation, status);
+  };
   service_ = std::make_unique<cimom::Service>(*broker_, std::move(options));
   warnOfOpenAccess(config_);
   server_ = std::make_unique<http::HttpServer>(
@@ -196,9 +202,12 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
       [service = service_.get()](const http::HttpRequest& request, http::ResponseSink& sink) {
         service->handle(request, sink);
       },
-      pagesOf(config_, listeners_), gate_);
+      pagesOf(config_, listeners_, metrics_), gate_);
   server_->setHostNames(config_.names);
   server_->setAudit([this](const access::AuditRecord& record) { audit_->take(record); });
+  server_->setRequestHook([this](const http::RequestEnd& end) { metrics_.requestEnded(end); });
+  metrics_.setServer(*server_);
+  metrics_.setCheckInterval(std::chrono::seconds(config_.checkSeconds));
   if (!config_.tls.certificate.empty()) certificate_.use(config_.tls, *server_);
 }
 
@@ -277,6 +286,7 @@ void Daemon::reload() try {
   makeRoomForConnections(fresh.limits);
   server_->setLimits(fresh.limits);
   server_->setHostNames(fresh.names);
+  metrics_.setCheckInterval(std::chrono::seconds(fresh.checkSeconds));
   if (certificate_.exists() && !fresh.tls.certificate.empty()) certificate_.renew(fresh.tls, *server_);
   if (needsRestart(config_, fresh)) {
     ZORVA_LOG(Warning, "addresses, port, socket, threads, nesting and provider directory change with the next start");
@@ -310,7 +320,7 @@ int Daemon::timeout() const {
   if (server_->isBusy() || requestsTrimmed_ != server_->requestsTaken() || Clock::now() < acceptAgain_) {
     return kSweepMilliseconds;
   }
-  if (requestsTrimmed_ != 0) return kQuietMilliseconds;
+  if (requestsTrimmed_ != 0 || server_->streams() > 0) return kQuietMilliseconds;
   return certificate_.exists() ? kDayMilliseconds : -1;
 }
 
