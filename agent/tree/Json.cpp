@@ -189,10 +189,12 @@ class Builder : public nlohmann::json_sax<nlohmann::json> {
 };
 
 constexpr std::size_t kIndent = 2;
+constexpr std::size_t kOneLine = static_cast<std::size_t>(-1);  // for a depth
 
 void format(std::string& text, const JsonValue& value, std::size_t depth);
 
 void startLine(std::string& text, std::size_t depth) {
+  if (depth == kOneLine) return;
   text += '\n';
   text.append(depth * kIndent, ' ');
 }
@@ -201,11 +203,12 @@ std::string quoted(const std::string& bytes) { return nlohmann::json(bytesToJson
 
 // The elements of a list or the members of an object, each on its own line.
 void formatItems(std::string& text, const JsonValue& value, std::size_t depth) {
+  const std::size_t deeper = depth == kOneLine ? kOneLine : depth + 1;
   for (std::size_t i = 0; i < value.items.size(); ++i) {
     if (i != 0) text += ',';
-    startLine(text, depth + 1);
-    if (!value.keys.empty()) text += quoted(value.keys[i]) + ": ";
-    format(text, value.items[i], depth + 1);
+    startLine(text, deeper);
+    if (!value.keys.empty()) text += quoted(value.keys[i]) + (depth == kOneLine ? ":" : ": ");
+    format(text, value.items[i], deeper);
   }
   if (!value.items.empty()) startLine(text, depth);
 }
@@ -302,6 +305,12 @@ JsonValue readJsonFile(const std::string& path) {
   if (file.error != 0) throw ConfigError(path, 0, {}, "cannot be read: " + util::fileErrorText(file.error));
   if (file.truncated) throw ConfigError(path, 0, {}, "is larger than 64 MiB");
   return parseJson(file.text, path);
+}
+
+std::string formatJsonLine(const JsonValue& value) {
+  std::string text;
+  format(text, value, kOneLine);
+  return text;
 }
 
 std::string formatJson(const JsonValue& value) {

@@ -57,4 +57,7 @@ JsonValue readJsonFile(const std::string& path);
 /// The document as text, indented by two blanks, with a line feed at its end.
 std::string formatJson(const JsonValue& value);
 
+/// The same on one line, without a line feed.
+std::string formatJsonLine(const JsonValue& value);
+
 }  // namespace zorva::agent
