@@ -564,10 +564,9 @@ void HttpServer::Core::startStream(const Holder& exchange) {
     return exchange->finish({});
   }
   const std::lock_guard lock(streamsMutex_);
-  std::string problem = "the server is ending";
-  if (takesStreams_) problem = exchange->page->stream(exchange->request, exchange);
-  if (!problem.empty()) {
-    exchange->refusal = Refusal{503, std::move(problem), {}};
+  exchange->refusal =
+      takesStreams_ ? exchange->page->stream(exchange->request, exchange) : Refusal{503, "the server is ending", {}};
+  if (exchange->refusal.has_value()) {
     logRefusal(*exchange, *exchange->refusal);
     return exchange->finish(*exchange->refusal);
   }

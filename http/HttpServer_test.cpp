@@ -548,14 +548,14 @@ const std::string kWatch = "GET /watch HTTP/1.1\r\nHost: localhost\r\nAccept-Enc
 class Streams {
  public:
   Page page() {
-    return {{}, false, [this](const HttpRequest&, const std::shared_ptr<Stream>& stream) {
+    return {{}, false, [this](const HttpRequest&, const std::shared_ptr<Stream>& stream) -> std::optional<Refusal> {
               const std::lock_guard lock(mutex_);
-              if (isFull_) return std::string("too many watch");
+              if (isFull_) return Refusal{503, "too many watch", {}};
               stream->beginStream({{"Content-Type", "application/x-ndjson"}});
               stream->offer("first\n");
               stream_ = stream;
               arrived_.open();
-              return std::string();
+              return std::nullopt;
             }};
   }
   std::shared_ptr<Stream> next() {

@@ -5,10 +5,12 @@
 #include <functional>
 #include <map>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 
 #include "http/Exchange.h"
+#include "http/RequestHead.h"
 
 namespace zorva::http {
 
@@ -21,8 +23,8 @@ struct Page {
   bool isPublic = false;
 
   /// Instead of `answer`: the response to GET, which the function keeps. It needs no worker meanwhile. Called on the
-  /// thread of the connection, so it must not wait. Returns a sentence if there is no room for another one.
-  std::function<std::string(const HttpRequest&, const std::shared_ptr<Stream>&)> stream = {};
+  /// thread of the connection, so it must not wait. Returns a refusal if the client does not get it.
+  std::function<std::optional<Refusal>(const HttpRequest&, const std::shared_ptr<Stream>&)> stream = {};
 };
 
 /// By path, without a query.

@@ -41,6 +41,7 @@
 #include "server/MetricsPage.h"
 #include "server/SettingOrigins.h"
 #include "server/Systemd.h"
+#include "server/Watchers.h"
 #include "util/FileDescriptor.h"
 
 namespace zorva::server {
@@ -126,9 +127,11 @@ void mendSettings() noexcept {
 }
 
 /// What GET returns.
-http::Pages pagesOf(const Config& config, const std::vector<http::Listener>& listeners, MetricsPage& metrics) {
+http::Pages pagesOf(const Config& config, const std::vector<http::Listener>& listeners, MetricsPage& metrics,
+                     Watchers& watchers) {
   http::Pages pages;
   pages.emplace("/metrics", metrics.page());
+  pages.emplace("/watch", watchers.page());
   pages.emplace("/", http::textPage(pageOf(listeners)));
   if (config.hasConsole) addConsole(pages);
   return pages;
@@ -165,7 +168,8 @@ class Daemon {
   std::unique_ptr<AuditLog> audit_;  ///< outlives what writes to it
   util::FileDescriptor signals_;
   std::vector<http::Listener> listeners_;
-  MetricsPage metrics_;  ///< outlives what counts in it
+  MetricsPage metrics_;                 ///< outlives what counts in it
+  std::unique_ptr<Watchers> watchers_;  ///< outlives what tells it of changes
   std::unique_ptr<broker::Broker> broker_;
   std::unique_ptr<cimom::Service> service_;
   std::shared_ptr<access::LoginGate> gate_;
@@ -189,9 +193,13 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
   audit_ = std::make_unique<AuditLog>(auditWriter(config_));
   gate_ = makeGate(config_);
   listeners_ = openListeners(config_, gate_->hasUsers());
+  watchers_ = std::make_unique<Watchers>(static_cast<std::size_t>(config_.watchers));
   broker_ = makeBroker(config_);
   cimom::ServiceOptions options = serviceOptions(config_);
-  options.audit = [this](const access::AuditRecord& record) { audit_->take(record); };
+  options.audit = [this](const access::AuditRecord& record) {
+    audit_->take(record);
+    watchers_->note(record);
+  };
   options.operationEnded = [this](const std::string& operation, int status) {
     metrics_.counters().operationEnded(operation, status);
   };
@@ -202,7 +210,7 @@ Daemon::Daemon(CommandLine commandLine, Config config, const MakeBroker& makeBro
       [service = service_.get()](const http::HttpRequest& request, http::ResponseSink& sink) {
         service->handle(request, sink);
       },
-      pagesOf(config_, listeners_, metrics_), gate_);
+      pagesOf(config_, listeners_, metrics_, *watchers_), gate_);
   server_->setHostNames(config_.names);
   server_->setAudit([this](const access::AuditRecord& record) { audit_->take(record); });
   server_->setRequestHook([this](const http::RequestEnd& end) { metrics_.requestEnded(end); });
@@ -286,6 +294,7 @@ void Daemon::reload() try {
   makeRoomForConnections(fresh.limits);
   server_->setLimits(fresh.limits);
   server_->setHostNames(fresh.names);
+  watchers_->setMost(static_cast<std::size_t>(fresh.watchers));
   metrics_.setCheckInterval(std::chrono::seconds(fresh.checkSeconds));
   if (certificate_.exists() && !fresh.tls.certificate.empty()) certificate_.renew(fresh.tls, *server_);
   if (needsRestart(config_, fresh)) {
