@@ -36,7 +36,7 @@ SETTING = 'ZORVA_DNSSettingData.InstanceID="Computer%eth0"'
 # Each command with words that make it succeed, in an order in which they do. A third element: its exit status.
 CALLS = [
     ("show", []), ("show", ["eth0"]), ("tree", []), ("classes", []), ("graph", []),
-    ("check", ["eth0"], 1),
+    ("check", ["eth0"], 1), ("watch", ["--count", "1"]),
     ("enumerate", ["CIM_ManagedElement"]), ("associators", [ENDPOINT]), ("references", [ENDPOINT]),
     ("names", ["CIM_ManagedElement"]), ("associator-names", [ENDPOINT]), ("reference-names", [ENDPOINT]),
     ("enumerate", ["ZORVA_SPComputerSystem"]), ("get", [ENDPOINT]), ("get", [SETTING, "--property", "DomainName"]),
@@ -106,6 +106,17 @@ class Host:
                               env={**os.environ, "ZORVAGENT_CONFIG": str(self.directory / config)})
         return done.returncode, done.stdout, done.stderr
 
+    def watch(self, words):
+        """The same for a command that waits for a change, which is made once it watches."""
+        env = {**os.environ, "ZORVAGENT_CONFIG": str(self.directory / "agent.toml")}
+        watching = subprocess.Popen([self.bin / "zorvactl", "watch", *words, "-o", "json"], stdout=subprocess.PIPE,
+                                    stderr=subprocess.PIPE, text=True, env=env)
+        begun = watching.stderr.readline()
+        subprocess.run([self.bin / "zorvactl", "modify", ENDPOINT, "DomainName=watched.example.org"], check=True, env=env,
+                       stdout=subprocess.DEVNULL, timeout=60)
+        out, err = watching.communicate(timeout=60)
+        return watching.returncode, out, begun + err
+
     def serve(self):
         server = subprocess.Popen([self.bin / "zorvacimd", "--port", "0", "--config", self.directory / "server.toml",
                                    "--agent-config", self.directory / "agent.toml"], stdout=subprocess.PIPE,
@@ -146,7 +157,8 @@ def main():
         for command, words, *status in CALLS:
             tried.add(command)
             extra = ["--file", str(host.directory / "users")] if command.startswith("user ") else []
-            code, out, err = host.run([*command.split(), *words, *extra])
+            run = host.watch if command == "watch" else host.run
+            code, out, err = run([*([] if command == "watch" else command.split()), *words, *extra])
             if code != (status[0] if status else 0):
                 problems.append(f"{command}: exit status {code}: {err}")
             if command not in table:

@@ -12,6 +12,7 @@ void addCommands(CommandLine& line);
 
 void addShowCommand(CommandLine& line);
 void addCheckCommand(CommandLine& line);
+void addWatchCommand(CommandLine& line);
 void addTreeCommand(CommandLine& line);
 void addClassesCommand(CommandLine& line);
 void addGraphCommand(CommandLine& line);

@@ -139,6 +139,25 @@ no program ever asks, because they are named twice or after the first three of <
 exist for the servers that are asked for them. If there is any of this, the exit status is 1.
 )";
 
+constexpr std::string_view kWatch = R"(
+A line for each change while the command runs: when it was seen, the interface, the property, its old and its new value, and
+who has set it, in brackets. It runs until it is interrupted, its output is closed, or after `--count` changes. A line on
+standard error says that it has begun.
+
+Properties have the names of `zorvactl tree --output json`. "interface" is one that came or went. A property such as
+"ifcfg.DNSSERVERS" is a line in the file of settings of the interface. "-" is no interface, no value, or nobody known. Who has
+set it is the owner of the interface's DNS settings ("NetworkManager"), a file (<ifcfg-NAME>, <overlay.json>,
+</etc/resolv.conf>), `kernel` or `BMC`. Through a server of this project it is the user who made the change by that server
+("anonymous" without a login), where there was such a user moments before.
+
+The command sleeps in the kernel until an interface, a file, the message bus or the name of the host changes. Several changes
+within a twentieth of a second may be seen as one. With `--url` the server reports: a `zorvacimd`, to clients that may read.
+
+## JSON
+With `--json`, or `--output json`, each line is an object with "version", "time" (RFC 3339, UTC), "system", "interface",
+"property", "old", "new" and "by". What is not known or is no value is null.
+)";
+
 constexpr std::string_view kTree = R"(
 Shows what the agent has read of this host, as the providers see it. Values that were set and replace the host's own are
 marked. With `--output json` it is a document that the agent reads back as a tree file (`agent.toml`(5)).
@@ -330,6 +349,7 @@ constexpr Prose kAll[] = {
     {"", kProgram},
     {"show", kShow},
     {"check", kCheck},
+    {"watch", kWatch},
     {"tree", kTree},
     {"classes", kClasses},
     {"graph", kGraph},

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
+#include <exception>
 
 #include "cli/operations/Curl.h"
 #include "cli/operations/ServerCertificate.h"
@@ -168,6 +169,60 @@ HttpReply HttpClient::post(const std::vector<std::string>& fields, const std::st
   const CURLcode code = curl_->perform(curl_->easy);
   curl_->set(CURLOPT_HTTPHEADER, static_cast<curl_slist*>(nullptr));
   if (code != CURLE_OK) fail(code, reply);
+  curl_->getinfo(curl_->easy, CURLINFO_RESPONSE_CODE, &reply.status);
+  return reply;
+}
+
+namespace {
+
+/// The lines of a response that goes on.
+struct Lines {
+  CURL* easy;
+  decltype(&::curl_easy_getinfo) getinfo;
+  const std::function<bool(std::string_view)>& take;
+  HttpReply& reply;
+  std::string unfinished = {};
+  bool isOver = false;
+  std::exception_ptr thrown = nullptr;
+
+  void add(std::string_view text) {
+    unfinished += text;
+    for (std::size_t end = unfinished.find('\n'); end != std::string::npos && !isOver; end = unfinished.find('\n')) {
+      isOver = !take(std::string_view(unfinished).substr(0, end));
+      unfinished.erase(0, end + 1);
+    }
+    isOver = isOver || unfinished.size() > kLargestReply;
+  }
+
+  // No exception may pass through libcurl, which is C.
+  static std::size_t write(char* data, std::size_t size, std::size_t count, void* self) noexcept {
+    auto& lines = *static_cast<Lines*>(self);
+    lines.getinfo(lines.easy, CURLINFO_RESPONSE_CODE, &lines.reply.status);
+    try {
+      if (lines.reply.status != 200) return takeBody(data, size, count, &lines.reply);
+      lines.add({data, size * count});
+    } catch (...) {
+      lines.thrown = std::current_exception();
+    }
+    return lines.isOver || lines.thrown != nullptr ? 0 : size * count;
+  }
+};
+
+}  // namespace
+
+HttpReply HttpClient::follow(const std::string& path, const std::function<bool(std::string_view line)>& take) {
+  HttpReply reply;
+  Lines lines{curl_->easy, curl_->getinfo, take, reply};
+  const std::string endpoint = server_.url.endpoint();
+  curl_->set(CURLOPT_URL, (endpoint.substr(0, endpoint.rfind('/')) + path).c_str());
+  curl_->set(CURLOPT_HTTPGET, 1L);
+  curl_->set(CURLOPT_WRITEFUNCTION, &Lines::write);
+  curl_->set(CURLOPT_WRITEDATA, static_cast<void*>(&lines));
+  curl_->set(CURLOPT_HEADERDATA, static_cast<void*>(&reply));
+  curl_->problem[0] = '\0';
+  const CURLcode code = curl_->perform(curl_->easy);
+  if (lines.thrown != nullptr) std::rethrow_exception(lines.thrown);
+  if (code != CURLE_OK && !lines.isOver) fail(code, reply);
   curl_->getinfo(curl_->easy, CURLINFO_RESPONSE_CODE, &reply.status);
   return reply;
 }

@@ -3,6 +3,7 @@
 // POST over HTTP/1.1, plain, over TLS or over a Unix socket, with libcurl.
 
 #include <chrono>
+#include <functional>
 #include <memory>
 #include <optional>
 #include <string>
@@ -43,6 +44,11 @@ class HttpClient : util::NotCopied {
   /// redirections or use proxies. Throws Failure if the server's certificate is not trusted, no reply comes, it is
   /// incomplete, or is larger than 256 MiB.
   HttpReply post(const std::vector<std::string>& fields, const std::string& body);
+
+  /// Asks for what is at that path of the server ("/watch"), and calls `take` with each line of the response, without
+  /// its line feed, until the server ends it, or `take` returns false. It has no time limit but that for silence.
+  /// Returns the whole reply if its status is not 200. Throws Failure as post does, and what `take` throws.
+  HttpReply follow(const std::string& path, const std::function<bool(std::string_view line)>& take);
 
  private:
   struct Pin;

@@ -127,6 +127,16 @@ std::optional<broker::Value> keyValue(const broker::Value& given, const schema::
 
 }  // namespace
 
+void followChanges(const Server& server, const std::function<bool(std::string_view line)>& take) {
+  HttpClient http(server);
+  const HttpReply reply = http.follow("/watch", take);
+  if (reply.status == 405 || reply.status == 404) {
+    throw Failure(ExitCode::Failed, server.url.shown() + " does not report changes",
+                  "zorvacimd does; other CIM servers do not");
+  }
+  requireSuccess(server.url, reply);
+}
+
 RemoteOperations::RemoteOperations(const Server& server, std::shared_ptr<const schema::ClassRepository> classes)
     : server_(server.url), classes_(std::move(classes)), served_(broker::ProviderRegistry::builtIn()), http_(server) {}
 

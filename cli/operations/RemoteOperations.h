@@ -2,9 +2,11 @@
 
 // The CIM operations on a server: CIM-XML over HTTP (DSP0200 1.4).
 
+#include <functional>
 #include <map>
 #include <memory>
 #include <string>
+#include <string_view>
 
 #include "cimxml/ResponseReader.h"
 #include "cli/operations/HttpClient.h"
@@ -13,6 +15,10 @@
 #include "util/Names.h"
 
 namespace zorva::cli {
+
+/// Reads what the server reports at /watch, line by line, until it ends that or `take` returns false. Empty lines only
+/// say that the connection is alive. Throws Failure if the server does not let this client watch, or cannot be reached.
+void followChanges(const Server& server, const std::function<bool(std::string_view line)>& take);
 
 class RemoteOperations : public Operations {
  public:
