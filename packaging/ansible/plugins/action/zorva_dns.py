@@ -18,7 +18,8 @@ class ActionModule(ActionBase):
         arguments = {"executable": self._task.args.get("executable")}
         confirmed = self._execute_module(module_name="zorva.dns.zorva_dns_confirm", module_args=arguments, task_vars=task_vars)
         if confirmed.get("failed"):
-            result.update(failed=True, msg=confirmed.get("msg", "the settings are not confirmed"))
+            reason = confirmed.get("msg", "no reason is known")
+            result.update(failed=True, msg="the settings are not confirmed, and the host takes them back: " + reason)
         else:
             result["trial"] = False
         return result
