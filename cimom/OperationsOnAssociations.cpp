@@ -123,13 +123,13 @@ Status answerNames(Operation& operation, const Question& question) {
 
 Status answerInstances(Operation& operation, const Question& question) {
   Stream stream(operation.writer);
-  const cimxml::InstanceDetail detail = detailOf(operation, question.selection);
+  cimxml::InstanceWriter writer(detailOf(operation, question.selection));
   const broker::InstanceSink write = [&](const broker::Instance& instance) {
     if (!mayRead(operation, instance.path)) return true;
     return stream.put([&](std::string& out) {
       out += "<VALUE.OBJECTWITHPATH>";
       cimxml::appendWholePath(out, instance.path, operation.host.name());
-      cimxml::appendInstance(out, instance, detail);
+      writer.append(out, instance);
       out += "</VALUE.OBJECTWITHPATH>";
     });
   };

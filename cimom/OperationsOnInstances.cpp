@@ -42,14 +42,14 @@ Status enumerateInstances(Operation& operation) {
   selection.deepInheritance = arguments.boolean("DeepInheritance", true);
   Status status = arguments.status();
   if (!status.ok()) return status;
-  const cimxml::InstanceDetail detail = detailOf(operation, selection);
+  cimxml::InstanceWriter writer(detailOf(operation, selection));
   Stream stream(operation.writer);
   operation.writer.beginReturnValue();
   const auto write = [&](const Instance& instance) {
     return stream.put([&](std::string& out) {
       out += "<VALUE.NAMEDINSTANCE>";
       cimxml::appendInstanceName(out, instance.path);
-      cimxml::appendInstance(out, instance, detail);
+      writer.append(out, instance);
       out += "</VALUE.NAMEDINSTANCE>";
     });
   };

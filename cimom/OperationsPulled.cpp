@@ -73,11 +73,12 @@ class Collector {
   explicit Collector(Operation& operation) : operation_(operation), objects_(operation.pulls) {}
 
   broker::InstanceSink instances(const broker::Selection& selection) {
-    return [this, detail = detailOf(operation_, selection)](const broker::Instance& instance) {
+    return [this, writer = cimxml::InstanceWriter(detailOf(operation_, selection))](
+               const broker::Instance& instance) mutable {
       if (!mayRead(operation_, instance.path)) return true;
       text_ = "<VALUE.INSTANCEWITHPATH>";
       cimxml::appendWholePath(text_, instance.path, operation_.host.name());
-      cimxml::appendInstance(text_, instance, detail);
+      writer.append(text_, instance);
       text_ += "</VALUE.INSTANCEWITHPATH>";
       return add();
     };

@@ -1,5 +1,7 @@
 #include "cimxml/ElementWriter.h"
 
+#include <algorithm>
+
 #include "cimxml/QualifierWriter.h"
 #include "cimxml/XmlText.h"
 
@@ -67,18 +69,13 @@ const char* propertyElement(const broker::Value& value) noexcept {
   return value.type == schema::Type::Reference ? "PROPERTY.REFERENCE" : "PROPERTY";
 }
 
-void appendProperty(std::string& out, const broker::Property& property, const broker::Instance& instance,
-                    const InstanceDetail& detail) {
-  const char* const element = propertyElement(property.value);
+void appendPropertyBegin(std::string& out, const broker::Property& property, const broker::Instance& instance,
+                         const InstanceDetail& detail) {
   out += '<';
-  out += element;
-  out += " NAME=\"";
-  appendEscaped(out, property.name);
-  out += '"';
+  out += propertyElement(property.value);
+  appendAttribute(out, "NAME", property.name);
   if (property.value.type != schema::Type::Reference) {
-    out += " TYPE=\"";
-    out += schema::typeName(property.value.type);
-    out += '"';
+    appendAttribute(out, "TYPE", schema::typeName(property.value.type));
   } else if (property.declaration != nullptr) {
     appendAttribute(out, "REFERENCECLASS", property.declaration->referenceClass);
   }
@@ -91,9 +88,17 @@ void appendProperty(std::string& out, const broker::Property& property, const br
     const bool inherited = property.declaration->origin != instance.declaration;
     appendQualifiers(out, property.declaration->qualifiers, inherited, *detail.qualifiers);
   }
-  appendValue(out, property.value);
+}
+
+/// Whether the declaration alone decides on the text around the value. A property with a declaration has its name.
+bool isAsDeclared(const broker::Property& property) noexcept {
+  return property.declaration != nullptr && property.value.type == property.declaration->type &&
+         property.value.isArray == property.declaration->isArray && !holdsInstance(property.value);
+}
+
+void appendPropertyEnd(std::string& out, const broker::Property& property) {
   out += "</";
-  out += element;
+  out += propertyElement(property.value);
   out += '>';
 }
 
@@ -189,14 +194,45 @@ void appendReturnValue(std::string& out, const broker::Value& value) {
 }
 
 void appendInstance(std::string& out, const broker::Instance& instance, const InstanceDetail& detail) {
-  out += "<INSTANCE";
-  appendAttribute(out, "CLASSNAME", instance.path.className);
-  out += '>';
-  if (detail.qualifiers != nullptr && instance.declaration != nullptr) {
-    appendQualifiers(out, instance.declaration->qualifiers(), false, *detail.qualifiers);
+  InstanceWriter(detail).append(out, instance);
+}
+
+void InstanceWriter::append(std::string& out, const broker::Instance& instance) {
+  if (!fits(instance)) makeForm(instance);
+  std::size_t done = 0;
+  for (std::size_t i = 0; i < values_.size(); ++i) {
+    const broker::Value& value = instance.properties[i].value;
+    if (value.isNull) continue;
+    out.append(form_, done, values_[i].place - done);
+    done = values_[i].place;
+    appendValue(out, value);
   }
-  for (const broker::Property& property : instance.properties) appendProperty(out, property, instance, detail);
-  out += "</INSTANCE>";
+  out.append(form_, done);
+}
+
+bool InstanceWriter::fits(const broker::Instance& instance) const noexcept {
+  if (declaration_ == nullptr || instance.declaration != declaration_) return false;
+  return std::equal(values_.begin(), values_.end(), instance.properties.begin(), instance.properties.end(),
+                    [](const ValuePlace& known, const broker::Property& property) {
+                      return property.declaration == known.declaration && isAsDeclared(property);
+                    });
+}
+
+void InstanceWriter::makeForm(const broker::Instance& instance) {
+  declaration_ = instance.declaration;
+  values_.clear();
+  form_ = "<INSTANCE";
+  appendAttribute(form_, "CLASSNAME", instance.path.className);
+  form_ += '>';
+  if (detail_.qualifiers != nullptr && instance.declaration != nullptr) {
+    appendQualifiers(form_, instance.declaration->qualifiers(), false, *detail_.qualifiers);
+  }
+  for (const broker::Property& property : instance.properties) {
+    appendPropertyBegin(form_, property, instance, detail_);
+    values_.push_back({isAsDeclared(property) ? property.declaration : nullptr, form_.size()});
+    appendPropertyEnd(form_, property);
+  }
+  form_ += "</INSTANCE>";
 }
 
 }  // namespace zorva::cimxml

@@ -6,8 +6,10 @@
 // any input: characters that XML 1.0 cannot hold, and bytes that are no UTF-8, become U+FFFD. The functions keep no
 // state and throw only std::bad_alloc; each may be called on any thread.
 
+#include <cstddef>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "broker/objects/Value.h"
 
@@ -48,5 +50,29 @@ struct InstanceDetail {
 
 /// INSTANCE with a PROPERTY, PROPERTY.ARRAY or PROPERTY.REFERENCE for each of its properties, in their order.
 void appendInstance(std::string& out, const broker::Instance& instance, const InstanceDetail& detail = {});
+
+/// The same for many instances. The text around the values is made once and used again while the instances have the
+/// same class and the same properties in the same order. Used by one thread at a time.
+class InstanceWriter {
+ public:
+  explicit InstanceWriter(const InstanceDetail& detail) : detail_(detail) {}
+
+  void append(std::string& out, const broker::Instance& instance);
+
+ private:
+  /// The property is null if another instance could have another element there.
+  struct ValuePlace {
+    const schema::ClassProperty* declaration;
+    std::size_t place;  ///< in form_
+  };
+
+  bool fits(const broker::Instance& instance) const noexcept;
+  void makeForm(const broker::Instance& instance);
+
+  InstanceDetail detail_;
+  const schema::Class* declaration_ = nullptr;
+  std::string form_;  ///< an instance without values
+  std::vector<ValuePlace> values_;
+};
 
 }  // namespace zorva::cimxml

@@ -3,7 +3,12 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
+#include <memory>
 #include <string>
+#include <utility>
+#include <vector>
+
+#include "schema/Mof.h"
 
 namespace zorva::cimxml {
 namespace {
@@ -33,6 +38,14 @@ std::string instanceElement(const Property& property, bool classOrigin = false) 
   std::string out;
   appendInstance(out, instance, {classOrigin, nullptr});
   return out;
+}
+
+Value embedded(const char* className) {
+  Instance inner;
+  inner.path.className = className;
+  Value value = Value::text("");
+  value.scalar = broker::Boxed<Instance>(inner);
+  return value;
 }
 
 TEST(XmlValue, IsNothingIfItIsNull) { EXPECT_EQ(elementOf(Value::null(schema::Type::String)), ""); }
@@ -151,6 +164,51 @@ TEST(XmlInstance, WritesTheQualifiersOfItsClassAndProperties) {
       R"(</QUALIFIER><VALUE>v</VALUE></PROPERTY></INSTANCE>)");
 }
 
+TEST(XmlInstance, IsTheSameAfterAnyOther) {
+  const auto classes = std::make_shared<schema::ClassRepository>();
+  schema::RepositorySink sink(*classes);
+  ASSERT_TRUE(schema::parseMof("class A { string Name; uint16 State; string List[]; }; class B : A { string More; };",
+                               "t.mof", sink));
+  const schema::Class& a = *classes->find("A");
+  const schema::Class& b = *classes->find("B");
+  const auto instance = [](const schema::Class& declared, std::vector<std::pair<const char*, Value>> properties) {
+    Instance made;
+    made.path.className = declared.name();
+    made.declaration = &declared;
+    for (auto& [name, value] : properties)
+      made.properties.push_back({name, std::move(value), declared.findProperty(name)});
+    return made;
+  };
+  const Value none = Value::null(schema::Type::String);
+  const Value state = Value::unsignedNumber(2, schema::Type::Uint16);
+  const std::vector<Instance> instances = {
+      instance(a, {{"Name", Value::text("eth0")}, {"State", state}, {"List", Value::textArray({"x"})}}),
+      instance(a, {{"Name", none}, {"State", state}, {"List", Value::null(schema::Type::String, true)}}),
+      instance(a, {{"State", state}, {"Name", Value::text("<&>")}}),
+      instance(a, {{"State", state}}),
+      instance(b, {{"State", state}}),
+      instance(b, {{"State", state}, {"More", none}, {"NoSuch", Value::text("1")}}),
+      instance(b, {{"State", state}, {"More", none}, {"Other", Value::text("2")}}),
+      instance(b, {{"More", embedded("C")}}),
+      instance(b, {{"More", Value::text("plain")}}),
+      instance(a, {}),
+  };
+  for (const InstanceDetail& detail : {InstanceDetail(), InstanceDetail{true, classes.get()}}) {
+    InstanceWriter writer(detail);
+    for (const Instance& before : instances) {
+      for (const Instance& after : instances) {
+        std::string alone;
+        std::string second;
+        appendInstance(alone, after, detail);
+        writer.append(second, before);
+        second.clear();
+        writer.append(second, after);
+        EXPECT_EQ(second, alone);
+      }
+    }
+  }
+}
+
 TEST(XmlMethod, WritesWhatItGaveBack) {
   std::string out;
   appendReturnValue(out, Value::unsignedNumber(0, schema::Type::Uint32));
@@ -162,11 +220,7 @@ TEST(XmlMethod, WritesWhatItGaveBack) {
 }
 
 TEST(XmlInstance, HoldsAnEmbeddedInstanceAsItsText) {
-  Value value = Value::text("");
-  Instance inner;
-  inner.path.className = "I";
-  value.scalar = broker::Boxed<Instance>(inner);
-  EXPECT_EQ(instanceElement({"E", value, nullptr}),
+  EXPECT_EQ(instanceElement({"E", embedded("I"), nullptr}),
             R"(<INSTANCE CLASSNAME="C"><PROPERTY NAME="E" TYPE="string" EmbeddedObject="instance"><VALUE>)"
             R"(&lt;INSTANCE CLASSNAME=&quot;I&quot;&gt;&lt;/INSTANCE&gt;</VALUE></PROPERTY></INSTANCE>)");
 }

@@ -144,18 +144,20 @@ void fillInstancePath(const InstanceObject& object, ObjectPath& path) {
 
 namespace {
 
+/// True if it was that property already, as in the instance that was filled before.
+bool declare(const PropertyInfo& property, Property& filled) {
+  if (filled.declaration == property.declared) return true;
+  filled.name.assign(property.name->view());
+  filled.declaration = property.declared;
+  return false;
+}
+
 /// Makes the property at `place` null. Often the same property was there in the instance before; then nothing else
 /// changes.
 void fillNull(const PropertyInfo& property, std::size_t place, Instance& instance) {
   if (place == instance.properties.size()) instance.properties.emplace_back();
   Property& filled = instance.properties[place];
-  if (filled.declaration != property.declared) {
-    filled.name.assign(property.name->view());
-    filled.declaration = property.declared;
-  } else if (filled.value.isNull) {
-    return;
-  }
-  fillValue(nullData(property.type), filled.value);
+  if (!declare(property, filled) || !filled.value.isNull) fillValue(nullData(property.type), filled.value);
 }
 
 }  // namespace
@@ -169,8 +171,7 @@ void fillInstance(const InstanceObject& object, const PropertyMask& wanted, Inst
     if (!wanted.has(*slot.property)) continue;
     if (count == instance.properties.size()) instance.properties.emplace_back();
     Property& property = instance.properties[count++];
-    property.name.assign(slot.property->name->view());
-    property.declaration = slot.property->declared;
+    declare(*slot.property, property);
     fillValue(slot.data, property.value);
   }
   for (const PropertyInfo& property : object.info->properties()) {
