@@ -19,7 +19,7 @@ CMPIObjectPath* newHostPath(const CMPIBroker* broker, const std::string& nameSpa
 }
 
 CMPIInstance* newHostInstance(const CMPIBroker* broker, const std::string& nameSpace, const char* className,
-                              const char** properties, bool keysOnly, const std::vector<const char*>& keys) {
+                              const char** properties, bool keysOnly, const char* const* keys) {
   const CMPIObjectPath* path = newHostPath(broker, nameSpace, className, nullptr);
   CMPIInstance* instance = newInstance(broker, path, nullptr);
   if (!keysOnly) setPropertyFilter(instance, properties, keys);

@@ -23,6 +23,6 @@ CMPIObjectPath* newHostPath(const CMPIBroker* broker, const std::string& nameSpa
 /// A new instance on this host with the filter of these properties, or without one if only its keys are asked for; the
 /// broker's result, good or not.
 CMPIInstance* newHostInstance(const CMPIBroker* broker, const std::string& nameSpace, const char* className,
-                              const char** properties, bool keysOnly, const std::vector<const char*>& keys);
+                              const char** properties, bool keysOnly, const char* const* keys);
 
 }  // namespace ZV

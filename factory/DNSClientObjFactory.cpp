@@ -18,19 +18,24 @@ namespace {
 
 constexpr unsigned long kDNSResourceLibrary = 2;
 
-std::string localised(const wchar_t* key) {
-  return make_string(ResourceString(Locale::getResourceLibrary(kDNSResourceLibrary, Locale::getLanguageId()), key));
-}
-
 // The host's own endpoints are on the system with the given name; those of the service processor are on a system with a
 // fixed name.
 std::string systemNameFor(const DNSClient& client) {
   return strcasecmp(client.getDNSSCCN().c_str(), computerSystemClass) == 0 ? getSystemName() : "BMC:-1";
 }
 
-const std::vector<const char*> kSystemKeys = {"SystemCreationClassName", "CreationClassName", "SystemName", "Name"};
+constexpr const char* kSystemKeys[] = {"SystemCreationClassName", "CreationClassName", "SystemName", "Name", nullptr};
 
 }  // namespace
+
+const std::string& DNSClientObjFactory::localised(const wchar_t* key) {
+  const auto [place, isNew] = texts.try_emplace(key);
+  if (isNew) {
+    place->second =
+        make_string(ResourceString(Locale::getResourceLibrary(kDNSResourceLibrary, Locale::getLanguageId()), key));
+  }
+  return place->second;
+}
 
 // If reading the endpoints fails, the records read before are used.
 DNSClientObjFactory::DNSClientObjFactory() {
@@ -90,7 +95,7 @@ void setKeys(const CMPIInstance* instance, const DNSClient& dc) {
 }  // namespace
 
 CMPIInstance* DNSClientObjFactory::makeDNSClientInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
-                                                         DNSClient dc, const char** properties, bool isObjPath,
+                                                         const DNSClient& dc, const char** properties, bool isObjPath,
                                                          CMPIStatus* rc) {
   const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " dc=", &dc,
                      " properties=", properties, " isObjPath=", isObjPath, " rc=", rc);
@@ -184,7 +189,7 @@ unsigned short DNSClientObjFactory::getAllDNSServerCMPIObjPaths(const CMPIBroker
 }
 
 CMPIInstance* DNSClientObjFactory::makeDNSServerInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
-                                                         DNSServer ds, const char** properties, bool isObjPath,
+                                                         const DNSServer& ds, const char** properties, bool isObjPath,
                                                          CMPIStatus* rc) {
   const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " ds=", &ds,
                      " properties=", properties, " isObjPath=", isObjPath, " rc=", rc);

@@ -63,7 +63,7 @@ CMPIInstance* makeDNSGeneralSettingDataInstance(const CMPIBroker* broker, const 
   const WantedProperties wanted(properties, isObjPath);
 
   CMPIInstance* instance = newHostInstance(broker, nameSpaceOf(ref, nullptr), dnsGeneralSettingDataClass, properties,
-                                           isObjPath, {"InstanceID"});
+                                           isObjPath, kSettingKeys);
   if (!isGood(instance)) return instance;
 
   setText(instance, "InstanceID", generalInstanceID());

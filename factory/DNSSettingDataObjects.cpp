@@ -77,7 +77,7 @@ CMPIInstance* makeDNSSettingDataInstance(const CMPIBroker* broker, const CMPIObj
   const WantedProperties wanted(properties, isObjPath);
 
   CMPIInstance* instance =
-      newHostInstance(broker, nameSpaceOf(ref, nullptr), dnsSettingDataClass, properties, isObjPath, {"InstanceID"});
+      newHostInstance(broker, nameSpaceOf(ref, nullptr), dnsSettingDataClass, properties, isObjPath, kSettingKeys);
   if (!isGood(instance)) return instance;
 
   setPlainProperties(instance, wanted, data);

@@ -12,6 +12,8 @@
 
 namespace ZV {
 
+inline constexpr const char* kSettingKeys[] = {"InstanceID", nullptr};
+
 template <typename Cursor>
 void setTextIfWanted(const CMPIInstance* instance, const WantedProperties& wanted, const char* name, Cursor& cursor,
                      bool (Cursor::*getter)(std::string&)) {

@@ -80,7 +80,8 @@ CMPIStatus returnObject(const CMPIBroker* broker, const CMPIResult* result, cons
 
   std::vector<const char*> keys;
   for (const HostProperty& key : object.keys) keys.push_back(key.name);
-  setPropertyFilter(instance, properties, std::move(keys));
+  keys.push_back(nullptr);
+  setPropertyFilter(instance, properties, keys.data());
   PropertySetter setter(broker, instance);
   for (const HostProperty& key : object.keys) setter.set(key);
   for (const HostProperty& property : object.properties) {

@@ -16,12 +16,12 @@ static const std::string loggerDNSClient = "Zorvagent.DNSClient";
 static const char* const spcomputerSystemClass = "ZORVA_SPComputerSystem";
 static const char* const computerSystemClass = "ZORVA_ComputerSystem";
 
-std::string DNSClient::getNameFormat() {
+const std::string& DNSClient::getNameFormat() const {
   nameFormat = "NICName";
   return nameFormat;
 }
 
-std::string DNSClient::getOtherTypeDescription() {
+const std::string& DNSClient::getOtherTypeDescription() const {
   otherTypeDescription = "DNS";
   return otherTypeDescription;
 }
@@ -129,7 +129,7 @@ void addClient(Instrumentation& cursor, const LogSite& site, std::map<std::strin
     warnUnless(client.setDNSClientName(key), site, "Failed while setting Name");
   }
   if (cursor.getProperty(NodeLexicon::PROP_HOST_NAME, string)) {
-    warnUnless(client.setHostName(string), site, "Failed while setting IP Host Name.");
+    warnUnless(client.setHostName(std::move(string)), site, "Failed while setting IP Host Name.");
   }
   if (cursor.getProperty(NodeLexicon::PROP_PROTOCOL_IF_TYPE, number)) {
     warnUnless(client.setprotocolIFType(number), site, "Failed while setting protocolIFType.");
@@ -141,7 +141,7 @@ void addClient(Instrumentation& cursor, const LogSite& site, std::map<std::strin
   }
   string.clear();
   if (cursor.getProperty(NodeLexicon::PROP_NAME, string)) {
-    warnUnless(client.setElementName(string), site, "Failed while setting Element Name");
+    warnUnless(client.setElementName(std::move(string)), site, "Failed while setting Element Name");
   }
   string.clear();
   if (cursor.getProperty(NodeLexicon::PROP_DOMAIN_NAME, string)) {
@@ -149,10 +149,10 @@ void addClient(Instrumentation& cursor, const LogSite& site, std::map<std::strin
     warnUnless(client.setDomainName(string), site, "Failed while setting Domain Name.");
   }
   if (cursor.getProperty(NodeLexicon::PROP_DNS_SUFFIXES, suffixes)) {
-    warnUnless(client.setDNSSuffixesToAppend(suffixes), site, "Failed while setting DNSSuffixesToAppend");
+    warnUnless(client.setDNSSuffixesToAppend(std::move(suffixes)), site, "Failed while setting DNSSuffixesToAppend");
   }
   warnUnless(client.setDNSSCCN(systemClassOf(cursor, site)), site, "Failed while setting System Creation Class Name");
-  dnsClientMap[key] = client;  // of several nodes with one name the last is kept
+  dnsClientMap[std::move(key)] = std::move(client);  // of several nodes with one name the last is kept
 }
 
 }  // namespace

@@ -3,6 +3,7 @@
 #include <Instrumentation.h>
 
 #include <exception>
+#include <utility>
 #include <vector>
 
 #include "trace/Trace.h"
@@ -16,22 +17,22 @@ unsigned short DNSServer::setOrderOfAccess(unsigned short order) {
   return 0;
 }
 
-unsigned short DNSServer::getAccessContext() {
+unsigned short DNSServer::getAccessContext() const {
   accessContext = 3;
   return accessContext;
 }
 
-unsigned short DNSServer::getInfoFormat() {
+unsigned short DNSServer::getInfoFormat() const {
   infoFormat = accessInfo.find(':') != std::string::npos ? 4 : 3;
   return infoFormat;
 }
 
-std::string DNSServer::getNameFormat() {
+const std::string& DNSServer::getNameFormat() const {
   nameFormat = "DNSServer";
   return nameFormat;
 }
 
-std::string DNSServer::getElementName() {
+const std::string& DNSServer::getElementName() const {
   elementName = accessInfo;
   return elementName;
 }
@@ -47,7 +48,7 @@ void addServers(const std::vector<std::string>& addresses, const LogSite& site,
       DNSServer server;
       server.setAccessInfo(address);
       server.setOrderOfAccess(order);
-      dnsServerMap[address] = server;
+      dnsServerMap[address] = std::move(server);
     }
     ++order;  // a skipped address counts too
   }

@@ -54,6 +54,11 @@ std::string sourceKey(Operation& operation, const char* name) {
   return keyText(operation.ref, name, &operation.status);
 }
 
+void setPairFilter(const Operation& operation, const Association& association, CMPIInstance* instance) {
+  const char* const keys[] = {association.references.first, association.references.second, nullptr};
+  setPropertyFilter(instance, operation.properties, keys);
+}
+
 void setPair(const CMPIInstance* instance, const Association& association, const CMPIObjectPath* first,
              const CMPIObjectPath* second) {
   setReference(instance, association.references.first, first);
@@ -78,7 +83,7 @@ bool addBuilt(Operation& operation, const Association& association, const std::s
     if (notMade != nullptr) complain(operation, notMade, place);
     return true;
   }
-  setPropertyFilter(instance, operation.properties, {association.references.first, association.references.second});
+  setPairFilter(operation, association, instance);
   setPair(instance, association, first, second);
   instances.push_back(instance);
   return true;

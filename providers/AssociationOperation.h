@@ -193,6 +193,9 @@ std::string sourceKey(Operation& operation, const char* name);
 
 // --- Pairs.
 
+/// Filters an instance by the request's properties, with both references as its keys.
+void setPairFilter(const Operation& operation, const Association& association, CMPIInstance* instance);
+
 /// Sets both references of an instance and the association's other properties.
 void setPair(const CMPIInstance* instance, const Association& association, const CMPIObjectPath* first,
              const CMPIObjectPath* second);

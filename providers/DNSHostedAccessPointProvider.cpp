@@ -42,7 +42,7 @@ static unsigned short DNSHostedAccessPointCMPIInstances(Operation operation, std
         return 1;
       }
       CMPIInstance* instance = newInstance(broker, path, &operation.status);
-      setPropertyFilter(instance, operation.properties, {"Antecedent", "Dependent"});
+      setPairFilter(operation, hostedAccessPoint, instance);
       setPair(instance, hostedAccessPoint, system, endpoint);
       instances.push_back(instance);  // good or not
     }

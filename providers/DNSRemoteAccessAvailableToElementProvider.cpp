@@ -37,7 +37,7 @@ static unsigned short RemoteAccessAvailableToElementCMPIInstances(Operation oper
       CMPIInstance* instance = newInstance(broker, path, nullptr);
       instances.push_back(instance);  // good or not
       if (!isGood(instance)) continue;
-      setPropertyFilter(instance, operation.properties, {"Antecedent", "Dependent"});
+      setPairFilter(operation, remoteAccess, instance);
       setPair(instance, remoteAccess, server, client);
       setUint16(instance, "OrderOfAccess", factory.getOrderOfAccess(broker, server, &operation.status));
     }

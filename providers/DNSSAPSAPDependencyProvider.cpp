@@ -58,7 +58,7 @@ static unsigned short DNSSAPSAPDependencyCMPIInstances(Operation operation, std:
     if (isMissing(operation, path, "Create CMPIObjectPath failed for \t\t\t\tDNSSAPSAPDependency.")) return 1;
     CMPIInstance* instance = newInstance(broker, path, &operation.status);
     if (!isGood(instance)) continue;
-    setPropertyFilter(instance, operation.properties, {"Antecedent", "Dependent"});
+    setPairFilter(operation, sapDependency, instance);
     setPair(instance, sapDependency, ipEndpoint, endpointPath);
     instances.push_back(instance);
   }

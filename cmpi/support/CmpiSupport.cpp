@@ -1,6 +1,6 @@
 #include "cmpi/support/CmpiSupport.h"
 
-#include <utility>
+#include <cstring>
 
 namespace zorva::cmpi {
 
@@ -131,10 +131,10 @@ CMPIStatus setArray(const CMPIInstance* instance, const char* name, CMPIArray* a
   return isGood(array) ? set(instance, name, &CMPIValue::array, array, arrayType) : kStatusOk;
 }
 
-void setPropertyFilter(CMPIInstance* instance, const char** properties, std::vector<const char*> keys) {
+void setPropertyFilter(CMPIInstance* instance, const char** properties, const char* const* keys) {
   if (!isGood(instance)) return;
-  keys.push_back(nullptr);
-  instance->ft->setPropertyFilter(instance, properties, keys.data());
+  instance->ft->setPropertyFilter(instance, properties,
+                                  const_cast<const char**>(keys));  // CMPI's list has no const form
 }
 
 CMPIStatus setTextElement(CMPIArray* array, CMPICount index, CMPIString* string) {
@@ -189,11 +189,11 @@ CMPIStatus returnDone(const CMPIResult* result) {
   return result != nullptr ? result->ft->returnDone(result) : kStatusOk;
 }
 
-WantedProperties::WantedProperties(const char** properties, bool keysOnly) : all_(properties == nullptr && !keysOnly) {
-  if (properties == nullptr) return;
-  for (const char** name = properties; *name != nullptr; ++name) names_.insert(*name);
+bool WantedProperties::operator()(const char* name) const {
+  if (properties_ == nullptr) return !keysOnly_;
+  const char** listed = properties_;
+  while (*listed != nullptr && std::strcmp(*listed, name) != 0) ++listed;
+  return *listed != nullptr;
 }
-
-bool WantedProperties::operator()(const char* name) const { return all_ || names_.contains(name); }
 
 }  // namespace zorva::cmpi

@@ -11,7 +11,6 @@
 
 #include <span>
 #include <string>
-#include <unordered_set>
 #include <vector>
 
 namespace zorva::cmpi {
@@ -65,7 +64,9 @@ CMPIStatus setUint64(const CMPIInstance* instance, const char* name, CMPIUint64 
 CMPIStatus setBoolean(const CMPIInstance* instance, const char* name, bool value);
 CMPIStatus setReference(const CMPIInstance* instance, const char* name, const CMPIObjectPath* reference);
 CMPIStatus setArray(const CMPIInstance* instance, const char* name, CMPIArray* array, CMPIType arrayType);
-void setPropertyFilter(CMPIInstance* instance, const char** properties, std::vector<const char*> keys);
+
+/// A null ends each of the lists. A null list of properties means all.
+void setPropertyFilter(CMPIInstance* instance, const char** properties, const char* const* keys);
 
 CMPIStatus setTextElement(CMPIArray* array, CMPICount index, CMPIString* string);
 CMPIStatus setUint16Element(CMPIArray* array, CMPICount index, CMPIUint16 number);
@@ -97,15 +98,15 @@ std::span<const Element> counted16(const std::vector<Element>& elements) {
 }
 
 /// Which properties of an instance a request asks for, by exact name. Without a list: all, or none if only the keys are
-/// requested. With a list, even an empty one: those on the list.
+/// requested. With a list, even an empty one: those on the list. The list outlives this.
 class WantedProperties {
  public:
-  WantedProperties(const char** properties, bool keysOnly);
+  WantedProperties(const char** properties, bool keysOnly) : properties_(properties), keysOnly_(keysOnly) {}
   bool operator()(const char* name) const;
 
  private:
-  std::unordered_set<std::string> names_;
-  bool all_;
+  const char** properties_;
+  bool keysOnly_;
 };
 
 }  // namespace zorva::cmpi
