@@ -5,6 +5,9 @@
 
 Each figure is the ratio of two things measured in the same run, in turns, since machines are noisy: the median of the
 one over the median of the other. NAME picks the figures whose name holds it. Exits 1 where a figure falls short.
+
+"table" prints what each class costs by the number of interfaces: the time of EnumerateInstances by its results, and that of
+Associators from one source by the interfaces. It has no targets.
 """
 
 import argparse
@@ -55,6 +58,8 @@ ASSOCIATIONS = {
 }
 
 PROVIDERS = [
+    Figure("an endpoint of 1,000, to one by a program that only makes the calls of CMPI", 4.5, "providers_bench",
+           "Endpoints/1000", "StraightEndpoints/1000"),
     Figure("an endpoint of 10,000, to one of 100", 1.5, "providers_bench", "Endpoints/10000", "Endpoints/100", 10000, 100),
     Figure("an endpoint of 1,000, to one of 100", 1.5, "providers_bench", "Endpoints/1000", "Endpoints/100", 1000, 100),
     Figure("an association of 64 servers by 256 endpoints, to one of 8 by 32", 1.5, "providers_bench",
@@ -137,6 +142,26 @@ def measure(build, figures):
     return results
 
 
+def print_table(build):
+    """What each class costs by the number of interfaces, in microseconds."""
+    command = [os.path.join(build, "bin", "providers_bench"), "--benchmark_filter=^Table", "--benchmark_format=json",
+               "--benchmark_min_time=0.05"]
+    output = subprocess.run(command, check=True, stdout=subprocess.PIPE, stderr=subprocess.PIPE).stdout
+    rows = {}
+    for measured in json.loads(output)["benchmarks"]:
+        row, interfaces = measured["name"].rsplit("/", 1)
+        divisor = measured["results"] if row.startswith("Table/") else int(interfaces)
+        rows.setdefault(row, {})[int(interfaces)] = measured["cpu_time"] / 1000 / divisor
+    sizes = (10, 100, 1000, 10000)
+    for prefix, title in (("Table/", "EnumerateInstances, us for each result"),
+                          ("TableFromOne/", "Associators of one object, us for each interface")):
+        print(f"\n{title:48}" + "".join(f"{size:>9,}" for size in sizes))
+        for row, times in rows.items():
+            if row.startswith(prefix):
+                name = row[len(prefix):].removeprefix("ZORVA_").replace("/0", ", first end").replace("/1", ", second end")
+                print(f"{name:48}" + "".join(f"{times[size]:9.2f}" if size in times else f"{'':9}" for size in sizes))
+
+
 def human(nanoseconds):
     for unit, size in (("s", 1e9), ("ms", 1e6), ("us", 1e3)):
         if nanoseconds >= size:
@@ -149,6 +174,9 @@ def main():
     parser.add_argument("--build", default="build/bench", help="the build folder (default: %(default)s)")
     parser.add_argument("names", nargs="*", metavar="NAME", help="only figures whose name holds one of these")
     arguments = parser.parse_args()
+    if arguments.names == ["table"]:
+        print_table(arguments.build)
+        return 0
     figures = [figure for figure in FIGURES
                if not arguments.names or any(name in figure.name for name in arguments.names)]
     if not figures:
@@ -165,6 +193,8 @@ def main():
         verdict = "ok" if ratio <= figure.limit else "SHORT"
         short += verdict != "ok"
         print(f"{figure.name:{width}}  {ratio:5.2f}  {figure.limit:7g}  {verdict:5}  {human(top)} / {human(bottom)}")
+    if not arguments.names:
+        print_table(arguments.build)
     if short:
         print(f"{short} of {len(figures)} figures fall short", file=sys.stderr)
     return 1 if short else 0

@@ -6,12 +6,18 @@
 #include <unistd.h>
 
 #include <array>
+#include <chrono>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <stdexcept>
 #include <string>
+#include <thread>
+#include <variant>
+#include <vector>
 
 #include "agent/Agent.h"
+#include "bench/StraightEndpoints.h"
 #include "broker/Broker.h"
 #include "schema/Schema.h"
 #include "util/NotCopied.h"
@@ -54,6 +60,8 @@ class BenchHost : zorva::util::NotCopied {
     std::ofstream(directory_ / "agent.toml")
         << "[agent]\ndata_dir = \"data/\"\n[tree]\nsource = \"file\"\nfile = \"tree.json\"\n[log]\ntarget = \"off\"\n";
     zorva::agent::loadConfig((directory_ / "agent.toml").string());
+    // The first look at a file that was written just now is not the last one.
+    std::this_thread::sleep_for(std::chrono::milliseconds(20));
   }
 
  private:
@@ -69,16 +77,21 @@ zorva::broker::Broker& theBroker() {
   return broker;
 }
 
-std::size_t enumerateInstances(const char* className) {
-  std::size_t count = 0;
-  const zorva::broker::Status status =
-      theBroker().enumerateInstances("", className, {}, [&](const zorva::broker::Instance&) {
-        ++count;
-        return true;
-      });
+void enumerate(zorva::broker::Broker& broker, const char* className, const zorva::broker::InstanceSink& sink) {
+  const zorva::broker::Status status = broker.enumerateInstances("", className, {}, sink);
   if (status.rc != 0) throw std::runtime_error(status.message);
+}
+
+std::size_t countOf(zorva::broker::Broker& broker, const char* className) {
+  std::size_t count = 0;
+  enumerate(broker, className, [&](const zorva::broker::Instance&) {
+    ++count;
+    return true;
+  });
   return count;
 }
+
+std::size_t enumerateInstances(const char* className) { return countOf(theBroker(), className); }
 
 void run(benchmark::State& state, const char* className, std::size_t expected) {
   enumerateInstances(className);  // reads the tree, which does not change afterwards
@@ -88,12 +101,37 @@ void run(benchmark::State& state, const char* className, std::size_t expected) {
   state.SetItemsProcessed(static_cast<std::int64_t>(expected) * state.iterations());
 }
 
+constexpr const char* kEndpoints = "ZORVA_DNSProtocolEndPoint";
+
 void Endpoints(benchmark::State& state) {
   BenchHost host;
   host.use(static_cast<int>(state.range(0)), 2);
-  run(state, "ZORVA_DNSProtocolEndPoint", static_cast<std::size_t>(state.range(0)));
+  run(state, kEndpoints, static_cast<std::size_t>(state.range(0)));
 }
 BENCHMARK(Endpoints)->Arg(100)->Arg(1000)->Arg(10000)->Unit(benchmark::kMillisecond);
+
+std::vector<zorva::broker::Instance> instancesOf(zorva::broker::Broker& broker) {
+  std::vector<zorva::broker::Instance> instances;
+  enumerate(broker, kEndpoints, [&](const zorva::broker::Instance& instance) {
+    instances.push_back(instance);
+    return true;
+  });
+  return instances;
+}
+
+// The same instances by a program that only makes the calls of CMPI.
+void StraightEndpoints(benchmark::State& state) {
+  static zorva::broker::Broker broker(zorva::schema::loadBuiltInClasses(), straightEndpoints());
+  const auto count = static_cast<std::size_t>(state.range(0));
+  BenchHost host;
+  host.use(static_cast<int>(count), 2);
+  setStraightEndpoints(count);
+  if (instancesOf(broker) != instancesOf(theBroker())) return state.SkipWithError("other instances");
+  for (auto _ : state) {
+    if (countOf(broker, kEndpoints) != count) state.SkipWithError("wrong number of instances");
+  }
+}
+BENCHMARK(StraightEndpoints)->Arg(1000)->Unit(benchmark::kMillisecond);
 
 // Servers by endpoints.
 void RemoteAccess(benchmark::State& state) {
@@ -159,6 +197,87 @@ ASSOCIATION_BENCHMARK(DNSEndPointElementSettingData);
 ASSOCIATION_BENCHMARK(DNSGenOrderedComponent);
 ASSOCIATION_BENCHMARK(DNSOrderedComponent);
 
+// --- The table: each class, and each association from one source, by the number of interfaces.
+
+const zorva::broker::ObjectPath& referenceOf(const zorva::broker::Instance& instance, std::size_t number) {
+  for (const zorva::broker::Property& property : instance.properties) {
+    if (property.value.type != zorva::schema::Type::Reference || number-- != 0) continue;
+    return *std::get<zorva::broker::Boxed<zorva::broker::ObjectPath>>(property.value.scalar);
+  }
+  throw std::runtime_error(instance.path.className + " has no such reference");
+}
+
+void TableOfClass(benchmark::State& state, const char* className) {
+  BenchHost host;
+  host.use(static_cast<int>(state.range(0)), 2);
+  const std::size_t results = enumerateInstances(className);
+  run(state, className, results);
+  state.counters["results"] = static_cast<double>(results);
+}
+
+// The associators of the first instance's reference with that number.
+void TableFromOne(benchmark::State& state, const char* className, std::size_t reference) {
+  BenchHost host;
+  host.use(static_cast<int>(state.range(0)), 2);
+  zorva::broker::ObjectPath source;
+  enumerate(theBroker(), className, [&](const zorva::broker::Instance& instance) {
+    source = referenceOf(instance, reference);
+    return false;
+  });
+  zorva::broker::AssociationFilter filter;
+  filter.associationClass = className;
+  std::size_t results = 0;
+  for (auto _ : state) {
+    results = 0;
+    const zorva::broker::Status status =
+        theBroker().associators(source, filter, {}, [&](const zorva::broker::Instance&) { return ++results != 0; });
+    if (status.rc != 0) state.SkipWithError(status.message.c_str());
+  }
+  state.counters["results"] = static_cast<double>(results);
+}
+
+struct TableRow {
+  const char* className;
+  std::int64_t most;  ///< more interfaces take minutes: all endpoints are compared with all setting data
+  bool isAssociation;
+};
+constexpr TableRow kTable[] = {
+    {kEndpoints, 10000, false},
+    {"ZORVA_RemoteServiceAccessPoint", 10000, false},
+    {"ZORVA_DNSSettingData", 10000, false},
+    {"ZORVA_DNSGeneralSettingData", 10000, false},
+    {"ZORVA_RemoteAccessAvailableToElement", 10000, true},
+    {"ZORVA_DNSSAPSAPDependency", 10000, true},
+    {"ZORVA_DNSHostedAccessPoint", 10000, true},
+    {"ZORVA_DNSGeneralElementSettingData", 10000, true},
+    {"ZORVA_DNSGenEndPointElementSettingData", 10000, true},
+    {"ZORVA_DNSEndPointElementSettingData", 1000, true},
+    {"ZORVA_DNSGenOrderedComponent", 10000, true},
+    {"ZORVA_DNSOrderedComponent", 1000, true},
+};
+
+void registerTable() {
+  for (const TableRow& row : kTable) {
+    const std::string name = row.className;
+    auto* ofClass = benchmark::RegisterBenchmark(("Table/" + name).c_str(), TableOfClass, row.className);
+    std::vector<benchmark::internal::Benchmark*> all = {ofClass};
+    for (std::size_t reference = 0; row.isAssociation && reference < 2; ++reference) {
+      all.push_back(benchmark::RegisterBenchmark(("TableFromOne/" + name + "/" + std::to_string(reference)).c_str(),
+                                                 TableFromOne, row.className, reference));
+    }
+    for (auto* each : all) {
+      for (std::int64_t interfaces = 10; interfaces <= (each == ofClass ? row.most : 10000); interfaces *= 10) {
+        each->Arg(interfaces);
+      }
+    }
+  }
+}
+
 }  // namespace
 
-BENCHMARK_MAIN();
+int main(int argc, char** argv) {
+  registerTable();
+  benchmark::Initialize(&argc, argv);
+  benchmark::RunSpecifiedBenchmarks();
+  return 0;
+}

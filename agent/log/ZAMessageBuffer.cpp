@@ -1,11 +1,11 @@
 #include <array>
 #include <atomic>
-#include <charconv>
 #include <cstdint>
 #include <iterator>
 #include <locale>
 #include <optional>
 #include <streambuf>
+#include <string_view>
 #include <utility>
 
 #include "agent/interface/ZALogger.h"
@@ -137,13 +137,23 @@ ZAMessageBuffer& ZAMessageBuffer::operator<<(const char* text) {
 }
 
 ZAMessageBuffer& ZAMessageBuffer::appendAddress(const void* address) {
-  if (address == nullptr || !room_->writesPlainDigits()) {
+  if (!room_->writesPlainDigits()) {
     room_->stream() << address;
     return *this;
   }
-  char digits[2 + 2 * sizeof address] = {'0', 'x'};
-  const auto end = std::to_chars(digits + 2, std::end(digits), reinterpret_cast<std::uintptr_t>(address), 16).ptr;
-  room_->text.append(digits, static_cast<std::size_t>(end - digits));
+  constexpr std::string_view kDigits = "0123456789abcdef";
+  char text[2 + 2 * sizeof address];
+  char* begin = std::end(text);
+  auto rest = reinterpret_cast<std::uintptr_t>(address);
+  do {
+    *--begin = kDigits[rest % 16];
+    rest /= 16;
+  } while (rest != 0);
+  if (address != nullptr) {
+    *--begin = 'x';
+    *--begin = '0';
+  }
+  room_->text.append(begin, std::end(text));
   return *this;
 }
 
