@@ -16,6 +16,9 @@ class Bench_Endpoint {
   string ElementName; string Description; string Hostname; string DomainName; string OtherTypeDescription;
   uint16 EnabledState; uint16 RequestedState; uint16 ProtocolIFType; uint64 Speed; boolean AppendSuffixes;
   string Suffixes[];
+  string Unset1; string Unset2; string Unset3; string Unset4; uint16 Unset5; uint16 Unset6; uint16 Unset7; uint16 Unset8;
+  uint64 Unset9; uint64 Unset10; boolean Unset11; boolean Unset12; datetime Unset13; datetime Unset14;
+  uint16 Unset15[]; uint16 Unset16[]; string Unset17[]; string Unset18[]; string Unset19[]; string Unset20[];
 };
 class Bench_Few : Bench_Endpoint {};
 class Bench_Many : Bench_Endpoint {};

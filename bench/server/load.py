@@ -9,13 +9,18 @@ back. A second ratio is to a ceiling whose event threads answer by themselves. A
 hanging provider would block all connections of its thread. wrk measures all of them in turns, and the best turn of each
 counts, because other work on the machine only lowers a figure. Each request asks for all properties.
 
+"cpu" is the processor time of one request for 3 and for 1,000 endpoints, and how it grows from one connection to eight. With
+--before BUILD it is compared with that of another build, measured in turns with this one.
+
+"stream" is how soon the first byte of 10,000 instances arrives, and the memory that they take.
+
 "hostile" is how long a client waits while others send requests of 3.9 MB of one element, repeated.
 
 "tls" compares requests over HTTPS with plain HTTP, and those with a login with those without, on connections that stay
 open. "intruders" is how long a client that has logged in waits while others try passwords, or begin TLS handshakes and do
 not go on. The others run at the lowest priority, because they would have machines of their own.
 
-NAME picks the figures: few, many, start, memory, endpoints, tls, hostile, intruders. Exits 1 if a figure misses its target.
+NAME picks the figures: few, many, cpu, stream, start, memory, endpoints, tls, hostile, intruders. Exits 1 if a figure misses its target.
 """
 
 import argparse
@@ -189,6 +194,65 @@ def endpoints(build):
     return figures
 
 
+def processor_time(process):
+    """Seconds of processor time of a process, its ended threads included."""
+    with open(f"/proc/{process}/stat", encoding="utf-8") as file:
+        fields = file.read().rsplit(")", 1)[1].split()
+    return (int(fields[11]) + int(fields[12])) / os.sysconf("SC_CLK_TCK")
+
+
+def cpu_of_requests(build, before, interfaces):
+    """Processor time per request of real endpoints, at one connection and at eight, and that of the build before."""
+    builds = [build] + ([before] if before else [])
+    class_name = "ZORVA_DNSProtocolEndPoint"
+    times = {}
+    tails = []
+    with contextlib.ExitStack() as stack:
+        servers = [stack.enter_context(server(each, "zorvacimd", interfaces)) for each in builds]
+        for _ in range(TURNS):
+            for each, (process, port) in zip(builds, servers):
+                for connections in (1, 8):
+                    start = processor_time(process.pid)
+                    rate, half, most = load(port, class_name, connections, 2)
+                    times.setdefault((each, connections), []).append((processor_time(process.pid) - start) / (rate * 2))
+                    if each == build and connections == 1:
+                        tails.append(most / half)
+    least = {key: min(values) * 1e6 for key, values in times.items()}
+    name = f"{interfaces:,} endpoints"
+    figures = [Figure(f"{name}: CPU per request, 8 connections to 1", least[build, 8] / least[build, 1], 1.15, False,
+                      f"{least[build, 8]:.0f} / {least[build, 1]:.0f} us"),
+               Figure(f"{name}: p99, to p50", min(tails), 3, False, f"{statistics.median(tails):.1f} in the median turn")]
+    if before:
+        figures += [Figure(f"{name}, {connections} connections: CPU per request, to the build before",
+                           least[build, connections] / least[before, connections], 1, False,
+                           f"{least[build, connections]:.0f} / {least[before, connections]:.0f} us")
+                    for connections in (1, 8)]
+    return figures
+
+
+def first_byte(build, program, class_name, limits, interfaces=None):
+    """Milliseconds from a request for 10,000 instances to the first byte of its response, and the memory that it takes."""
+    body = request(class_name).encode()
+    head = (f"POST /cimom HTTP/1.1\r\nHost: 127.0.0.1\r\nContent-Type: application/xml\r\nContent-Length: {len(body)}\r\n"
+            f"CIMOperation: MethodCall\r\nCIMMethod: EnumerateInstances\r\nCIMObject: root/cimv2\r\n"
+            f"Connection: close\r\n\r\n").encode()
+    times = []
+    with server(build, program, interfaces) as (process, port):
+        for _ in range(7):
+            with socket.create_connection(("127.0.0.1", port)) as client:
+                begin = time.perf_counter()
+                client.sendall(head + body)
+                client.recv(1)
+                times.append((time.perf_counter() - begin) * 1000)
+                while client.recv(1 << 20):
+                    pass
+        with open(f"/proc/{process.pid}/status", encoding="utf-8") as file:
+            peak = int(re.search(r"VmHWM:\s+(\d+) kB", file.read()).group(1)) / 1024
+    return [Figure(f"10,000 of {class_name}: ms to the first byte", min(times), limits[0], False,
+                   f"{statistics.median(times):.1f} ms in the median"),
+            Figure(f"10,000 of {class_name}: resident memory at most, MB", peak, limits[1], False, f"{peak:.1f} MB")]
+
+
 def threads_time(process):
     """Ticks of processor time by the name of the threads: workers do providers and XML, MHD-worker does HTTP."""
     times = {}
@@ -328,12 +392,18 @@ def hostile(build):
 def main():
     parser = argparse.ArgumentParser(description=__doc__, formatter_class=argparse.RawDescriptionHelpFormatter)
     parser.add_argument("--build", default="build/bench", help="the build folder (default: %(default)s)")
-    parser.add_argument("names", nargs="*", metavar="NAME", help="only: few, many, endpoints, start, memory, tls, hostile, intruders")
+    parser.add_argument("--before", help="another build folder, to compare processor times with")
+    parser.add_argument("names", nargs="*", metavar="NAME", help="only: few, many, cpu, stream, endpoints, start, memory, tls, hostile, intruders")
     arguments = parser.parse_args()
     build = os.path.abspath(arguments.build)
+    before = os.path.abspath(arguments.before) if arguments.before else None
     parts = {
         "few": lambda: throughput(build, "Bench_Few", 0.35, 5),
         "many": lambda: throughput(build, "Bench_Many", 0.13, 5),
+        "cpu": lambda: cpu_of_requests(build, before, 3) + cpu_of_requests(build, before, 1000),
+        # The library makes all instances before it returns the first one.
+        "stream": lambda: (first_byte(build, "server_bench", "Bench_TenThousand", (10, 30))
+                           + first_byte(build, "zorvacimd", "ZORVA_DNSProtocolEndPoint", (None, None), 10000)),
         "start": lambda: start_time(build),
         "memory": lambda: memory(build),
         "endpoints": lambda: endpoints(build),
