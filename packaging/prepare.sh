@@ -58,6 +58,20 @@ need_packages() {
   fi
 }
 
+# unpack_packages FOLDER PACKAGE...: downloads the packages, without those that they depend on, and unpacks them into the folder once.
+unpack_packages() {
+  local folder=$1 package
+  shift
+  [ ! -e "$folder/complete" ] || return 0
+  rm -rf "$folder" && mkdir -p "$folder/archives" || die "cannot write to $folder"
+  local download=(apt-get download -q -o APT::Sandbox::User=root)
+  (cd "$folder/archives" && { "${download[@]}" "$@" || { apt-get update -q; "${download[@]}" "$@"; }; }) >"$folder/log" 2>&1 ||
+    die "apt-get could not download $*: is this machine connected to a package mirror? (all of it is in $folder/log)"
+  for package in "$folder"/archives/*.deb; do dpkg -x "$package" "$folder" || die "$package cannot be unpacked"; done
+  rm -rf "$folder/archives"
+  touch "$folder/complete"
+}
+
 # build PRESET [TARGET...]: configures once and builds what is not up to date; prints nothing if there is nothing to do.
 build() {
   local preset=$1 log
