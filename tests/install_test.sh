@@ -32,6 +32,8 @@ done
 for script in bash-completion/completions/zorvactl zsh/site-functions/_zorvactl fish/vendor_completions.d/zorvactl.fish; do
   test -s "$prefix/share/$script"
 done
+test -s "$prefix/share/zorvacimd/prometheus/zorva-alerts.yml"
+test -s "$prefix/share/ansible/collections/ansible_collections/zorva/dns/plugins/modules/zorva_dns.py"
 "$prefix/bin/zorvactl" names ZORVA_DNSGeneralSettingData >/dev/null
 if "$prefix/bin/zorvactl" ifcfg remove none 2>"$work/error"; then die 'a file was removed that does not exist'; fi
 grep -q "$prefix/var/lib/zorvagent" "$work/error" || die "another data directory: $(cat "$work/error")"
