@@ -45,10 +45,7 @@ options:
     description: How many seconds the settings are on trial. V(0) applies them for good at once.
     type: int
     default: 60
-  executable:
-    description: The path of C(zorvactl). By default it is looked for in the usual places.
-    type: path
-author: Zorva maintainers (@zorva)
+extends_documentation_fragment: zorva.dns.zorvactl
 attributes:
   check_mode:
     description: Says what would change.

@@ -10,11 +10,7 @@ short_description: Keep DNS settings that are on trial
 description:
   - Confirms the settings that C(zorvactl apply --confirm) has on trial on the host. Fails if there are none, because they were taken back.
   - M(zorva.dns.zorva_dns) calls this by itself.
-options:
-  executable:
-    description: The path of C(zorvactl). By default it is looked for in the usual places.
-    type: path
-author: Zorva maintainers (@zorva)
+extends_documentation_fragment: zorva.dns.zorvactl
 attributes:
   check_mode:
     description: It confirms nothing then.

@@ -10,11 +10,7 @@ short_description: Facts about the DNS settings of a host
 description:
   - Sets the fact C(zorva_dns), the document that C(zorvactl show --output json) writes.
   - It has the interfaces with their servers in search order, domain, suffixes, state and owner, and what belongs to the host.
-options:
-  executable:
-    description: The path of C(zorvactl). By default it is looked for in the usual places.
-    type: path
-author: Zorva maintainers (@zorva)
+extends_documentation_fragment: zorva.dns.zorvactl
 attributes:
   check_mode:
     description: It changes nothing.
