@@ -97,6 +97,11 @@ kernel's name, the addresses of its interfaces, the names in the certificate (fo
 must be that of the server itself. Other requests are answered with the status 403 and leave a line in the log. At the Unix
 socket any `Host` will do.
 
+## METRICS AND CHANGES
+GET of `/metrics` returns what Prometheus reads: DNS servers in their order, drift, what the server does; with
+`metrics.check_interval` also which DNS servers answer. GET of `/watch` returns changes of the host as they happen, a JSON
+object on each line; `zorvactl watch --url` shows them. Both are for clients that may read.
+
 ## SIGNALS
 = `SIGHUP`
 Read the configuration again and open the log anew. `zorvacimd.toml`(5) says which keys take effect at once; new files of
