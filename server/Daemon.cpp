@@ -298,7 +298,8 @@ void Daemon::reload() try {
   metrics_.setCheckInterval(std::chrono::seconds(fresh.checkSeconds));
   if (certificate_.exists() && !fresh.tls.certificate.empty()) certificate_.renew(fresh.tls, *server_);
   if (needsRestart(config_, fresh)) {
-    ZORVA_LOG(Warning, "addresses, port, socket, threads, nesting and provider directory change with the next start");
+    ZORVA_LOG(Warning,
+              "addresses, port, socket, threads, nesting, console and provider directory change with the next start");
   }
   config_ = std::move(fresh);
   ZORVA_LOG(Warning, "the configuration was read again");
