@@ -9,7 +9,7 @@ import time
 
 ELEMENT = "element-6066-11e4-a52e-4f735466cecf"
 KEYS = {"Tab": "\ue004", "Enter": "\ue007", "ArrowDown": "\ue015", "ArrowUp": "\ue013", "Escape": "\ue00c", "Shift": "\ue008", "End": "\ue010"}
-LONGEST = 20  # seconds that anything may take to appear
+LONGEST = 60  # seconds that anything may take to appear, on a machine that is busy with other things
 
 
 class DriverError(Exception):
@@ -33,7 +33,7 @@ class Browser:
                      "--disable-background-networking", "--disable-component-update", "--ignore-certificate-errors", "--hide-scrollbars",
                      f"--user-data-dir={self.profile.name}", f"--lang={language}", f"--accept-lang={language}",
                      f"--window-size={width},{height}"] + (["--force-dark-mode"] if scheme == "dark" else [])
-        wanted = {"browserName": "chrome", "acceptInsecureCerts": True, "goog:loggingPrefs": {"browser": "ALL"},
+        wanted = {"browserName": "chrome", "acceptInsecureCerts": True, "timeouts": {"script": 120000}, "goog:loggingPrefs": {"browser": "ALL"},
                   "goog:chromeOptions": {"binary": "/usr/bin/chromium", "args": arguments,
                                          "prefs": {"intl.accept_languages": language}}}
         self.session = ""
