@@ -1,16 +1,11 @@
 // The programs together: zorva-bmc beside the tests' Redfish service, and zorvactl, which sees and changes it.
 
-#include <fcntl.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
-#include <signal.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
-#include <chrono>
-#include <thread>
-
+#include "bmc/testing/RunningBmc.h"
 #include "bmc/testing/TestRedfish.h"
 #include "http/testing/TestCertificates.h"
 
@@ -26,44 +21,7 @@ using testing::json;
 using testing::kEth0;
 using ::testing::Not;
 using ::testing::Pair;
-
-/// zorva-bmc as a process, its standard error in a file.
-class RunningBmc : util::NotCopied {
- public:
-  explicit RunningBmc(const testing::TestRedfish& redfish, const std::string& config)
-      : log_(redfish.directory() / "log"), socket_(agent::bmcSocketBeside(redfish.bmcJson())) {
-    process_ = ::fork();
-    if (process_ == 0) {
-      ::dup2(::open(log_.c_str(), O_CREAT | O_WRONLY | O_TRUNC, 0600), STDERR_FILENO);
-      ::execl(ZORVA_BIN_DIR "/zorva-bmc", "zorva-bmc", "--config", config.c_str(), nullptr);
-      ::_exit(127);
-    }
-    for (int turn = 0; turn < 1500 && ::access(redfish.bmcJson().c_str(), F_OK) != 0; ++turn) {
-      std::this_thread::sleep_for(std::chrono::milliseconds(20));
-    }
-  }
-  ~RunningBmc() { stop(); }
-
-  int stop() {
-    int status = -1;
-    if (process_ <= 0) return status;
-    ::kill(process_, SIGTERM);
-    ::waitpid(process_, &status, 0);
-    process_ = -1;
-    return status;
-  }
-
-  std::string inProc(const std::string& name) const {
-    return contentsOf("/proc/" + std::to_string(process_) + "/" + name);
-  }
-  std::string log() const { return contentsOf(log_); }
-  const std::string& socket() const { return socket_; }
-
- private:
-  std::string log_;
-  std::string socket_;
-  pid_t process_ = -1;
-};
+using testing::RunningBmc;
 
 class ApplyTest : public ::testing::Test {
  protected:
