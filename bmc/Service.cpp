@@ -54,6 +54,12 @@ agent::BmcState formerState(const std::string& file) {
   }
 }
 
+/// Whether there is an interface of a service processor in it.
+bool hasInterfaces(const agent::BmcState& state) {
+  const auto isInterface = [](const agent::Node& node) { return node.type() == agent::NodeType::NetworkIPConfig; };
+  return std::any_of(state.tree->nodes().begin(), state.tree->nodes().end(), isInterface);
+}
+
 JsonValue oneMember(const char* name, JsonValue value) {
   JsonValue object = JsonValue::object();
   object.add(name, std::move(value));
@@ -153,6 +159,8 @@ bool Service::readOnce() {
     fresh.tree = treeOf(readManagers(redfish_, remark));
     fresh.readAt = secondsNow();
     fresh.interval = state_.interval;
+    // Some answer so while they start.
+    if (!hasInterfaces(fresh) && hasInterfaces(state_)) throw Failed(https_.url() + " shows no Ethernet interfaces");
     state_ = std::move(fresh);
     report(remark);
     publish();

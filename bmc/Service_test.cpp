@@ -171,6 +171,34 @@ TEST_F(ServiceTest, AServiceThatIsGoneLeavesTheLastStateAlsoAfterARestart) {
   EXPECT_THAT(state().problem, HasSubstr("no answer from https://127.0.0.1:1"));
 }
 
+TEST_F(ServiceTest, AServiceThatShowsNoInterfacesLeavesTheLastState) {
+  const auto reader = service();
+  ASSERT_TRUE(reader->readOnce());
+  const json nobody{{"Members", json::array()}, {"Members@odata.count", 0}};
+  for (const char* collection : {"/redfish/v1/Managers/1/EthernetInterfaces", "/redfish/v1/Managers"}) {
+    const agent::BmcState before = state();
+    const json full = redfish_.tell({{"get", collection}});
+    redfish_.tell({{"set", {{collection, nobody}}}});
+    const auto afterRestart = service();
+    for (Service* each : {reader.get(), afterRestart.get()}) {
+      EXPECT_FALSE(each->readOnce()) << collection;
+      EXPECT_EQ(state().readAt, before.readAt) << collection;
+      EXPECT_NE(nodeOf(state(), "/bmc.1/eth0/ip"), nullptr) << collection;
+      EXPECT_THAT(state().problem, HasSubstr("shows no Ethernet interfaces")) << collection;
+    }
+    redfish_.tell({{"set", {{collection, full}}}});
+    EXPECT_TRUE(reader->readOnce());
+    EXPECT_EQ(state().problem, "");
+  }
+}
+
+TEST_F(ServiceTest, AServiceThatNeverHadInterfacesIsReadAsItIs) {
+  redfish_.tell({{"set", {{"/redfish/v1/Managers", {{"Members", json::array()}, {"Members@odata.count", 0}}}}}});
+  ASSERT_TRUE(service()->readOnce());
+  EXPECT_EQ(state().tree->nodes().size(), 1U);
+  EXPECT_EQ(state().problem, "");
+}
+
 TEST_F(ServiceTest, ALoginThatIsRefusedIsNotTriedAgainAtOnce) {
   redfish_.tell({{"login", 401}});
   const auto reader = service();
