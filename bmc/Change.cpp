@@ -43,6 +43,12 @@ JsonValue padded(const StringList& servers, const Ethernet& now) {
   return list;
 }
 
+/// What a second 412 means when the ETag is the one of the first.
+std::string whyRefused(const std::string& resource, const std::string& etag) {
+  return std::string("the service refuses the ") + (etag.starts_with("W/") ? "weak " : "") +
+         "ETag that it gave itself for " + resource + ", so nothing was changed";
+}
+
 bool differs(const std::optional<bool>& now, const JsonValue* wanted) {
   return wanted != nullptr && now && *now != wanted->boolean;
 }
@@ -133,6 +139,7 @@ std::string warningBefore(const Ethernet& now, const WantedDns& wanted) {
 
 std::string change(Redfish& redfish, const std::string& resource, const PropertiesOn& propertiesOn) {
   constexpr int kMostAttempts = 2;
+  std::string refused;  // the ETag of the attempt before
   for (int attempt = 0; attempt < kMostAttempts; ++attempt) {
     const Resource found = redfish.fetch(resource);
     const Ethernet now = readEthernet(found.body);
@@ -142,6 +149,8 @@ std::string change(Redfish& redfish, const std::string& resource, const Properti
     const std::string target = isElsewhere ? now.settings : resource;
     const std::string etag = isElsewhere ? redfish.fetch(target).etag : found.etag;
     if (const auto remarks = redfish.patch(target, difference, etag)) return *remarks;
+    if (!etag.empty() && etag == refused) throw Failed(whyRefused(target, etag));
+    refused = etag;
   }
   throw Failed("somebody else keeps changing " + resource + "; try again later");
 }

@@ -301,6 +301,18 @@ TEST_F(ServiceTest, AChangeIsTriedOnceMoreAndNotForEver) {
   }
 }
 
+TEST_F(ServiceTest, AServiceThatRefusesItsOwnEtagIsNamedAsTheCause) {
+  redfish_.tell({{"etag", "weak"}, {"compares_strongly", true}});
+  const auto writer = service();
+  ASSERT_TRUE(writer->readOnce());
+  redfish_.patches();
+  EXPECT_THAT(ask(*writer, {{"action", "write"}, {"servers", {"192.0.2.1"}}})["problem"].get<std::string>(),
+              HasSubstr("refuses the weak ETag that it gave itself for " + std::string(kEth0)));
+  const json patches = redfish_.patches();
+  ASSERT_EQ(patches.size(), 2U) << "it may have been changed by somebody the first time";
+  EXPECT_EQ(patches[1]["If-Match"], "W/\"v1\"") << "never without an ETag: that could undo the change of another";
+}
+
 TEST_F(ServiceTest, AChangeMayBeInUseLaterAndTheServiceAwayMeanwhile) {
   Patience patience = kShort;
   patience.effect = milliseconds(5000);

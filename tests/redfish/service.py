@@ -30,6 +30,7 @@ SESSIONS = f"{ROOT}/SessionService/Sessions"
 INTERFACES = f"{ROOT}/Managers/1/EthernetInterfaces"
 SWITCHES = {
     "etag": "strong",    # "strong", "weak", "body" (@odata.etag alone) or "absent"
+    "compares_strongly": False,  # a weak ETag in If-Match never matches, as RFC 9110 has it
     "expand": True,      # $expand is offered
     "patch": 204,        # 200, 202, 204; 400 with ExtendedInfo; 503 or 412 once; 429
     "repeats": False,    # 412 and 503 come every time
@@ -135,6 +136,11 @@ class Service:
             return None
         text = f'"v{self.versions.get(path, 1)}"'
         return "W/" + text if self.switches["etag"] == "weak" else text
+
+    def matches(self, path, given):
+        """Whether a change with this field If-Match, or none, may be made."""
+        refuses = self.switches["compares_strongly"] and (given or "").startswith("W/")
+        return not refuses and given in (None, self.etag(path))
 
     def etag_field(self, path):
         return None if self.switches["etag"] == "body" else self.etag(path)
@@ -373,8 +379,9 @@ class Handler(http.server.BaseHTTPRequestHandler):
                 status = 204
             if self.path not in service.world:
                 return self.answer(404, error("The resource was not found."))
-            if status == 412 or (self.headers.get("If-Match") not in (None, service.etag(self.path))):
+            if status == 412:
                 service.versions[self.path] = service.versions.get(self.path, 1) + 1
+            if status == 412 or not service.matches(self.path, self.headers.get("If-Match")):
                 return self.answer(412, error("The resource has been changed."))
             if status == 503:
                 return self.answer(503, error("The service is busy."), Retry_After="1")
