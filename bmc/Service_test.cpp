@@ -379,6 +379,20 @@ TEST_F(ServiceTest, AnInterfaceWithoutFqdnHasNoDomainAndCannotBeGivenOne) {
               HasSubstr("lacks FQDN or HostName"));
 }
 
+TEST_F(ServiceTest, AnInterfaceWithoutStaticNameServersIsShownAndCannotBeGivenServers) {
+  redfish_.tell({{"set", {{kEth0, {{"StaticNameServers", nullptr}}}}}});
+  const auto writer = service();
+  ASSERT_TRUE(writer->readOnce());
+  EXPECT_EQ(*nodeOf(state(), "/bmc.1/eth0/ip")->list(PROP_DNS_SERVER_ADDRESSES),
+            (StringList{"192.0.2.53", "2001:db8::53"}));
+  redfish_.patches();
+  for (const char* action : {"read", "write"}) {
+    EXPECT_EQ(ask(*writer, {{"action", action}, {"servers", {"192.0.2.1"}}})["problem"],
+              "interface eth0 has no StaticNameServers: its DNS servers cannot be set by Redfish");
+  }
+  EXPECT_EQ(redfish_.patches(), json::array());
+}
+
 TEST_F(ServiceTest, SeveralManagersWithInterfacesOfOneNameHavePathsOfTheirOwn) {
   const std::string second = "/redfish/v1/Managers/2";
   const json eth0 = redfish_.tell({{"get", kEth0}});
