@@ -16,7 +16,7 @@ constexpr const char* kLoopback = "127.0.0.1";
 
 }  // namespace
 
-TestRedfish::TestRedfish()
+TestRedfish::TestRedfish(const std::string& mockup)
     : authority_(directory_, "authority"), files_(authority_.issue("redfish", {"redfish", {kLoopback}})) {
   int to[2];
   int from[2];
@@ -26,7 +26,7 @@ TestRedfish::TestRedfish()
     ::dup2(to[0], STDIN_FILENO);
     ::dup2(from[1], STDOUT_FILENO);
     ::execlp("python3", "python3", ZORVA_SOURCE_DIR "/tests/redfish/service.py", files_.certificate.c_str(),
-             files_.key.c_str(), ZORVA_REDFISH_SCHEMA_DIR, nullptr);
+             files_.key.c_str(), "--schemas", ZORVA_REDFISH_SCHEMA_DIR, "--mockup", mockup.c_str(), nullptr);
     ::_exit(127);
   }
   ::close(to[0]);

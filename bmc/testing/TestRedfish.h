@@ -23,7 +23,8 @@ inline constexpr const char* kEth0 = "/redfish/v1/Managers/1/EthernetInterfaces/
 
 class TestRedfish : util::NotCopied {
  public:
-  TestRedfish();
+  /// Answers as the mockup in that folder does; without one, as tests/redfish/world.json has it.
+  explicit TestRedfish(const std::string& mockup = {});
   ~TestRedfish();
 
   /// A command or switches; see service.py.

@@ -1,9 +1,10 @@
 #!/usr/bin/env python3
 """A Redfish service (DSP0266) for the tests, on a port of 127.0.0.1, with TLS, sessions and ETags.
 
-  service.py CERTIFICATE KEY [SCHEMA-FOLDER]
+  service.py CERTIFICATE KEY [--schemas FOLDER] [--mockup FOLDER]
 
-It begins with the resources of world.json and prints its port. Each line of standard input is a JSON object of switches
+It begins with the resources of world.json and prints its port. With a mockup, those of the mockup are in their place: each
+index.json is the answer of /redfish/v1/ plus its path. Each line of standard input is a JSON object of switches
 (see SWITCHES), or of a command, and is answered with one line:
   {"patch": 204}                         sets switches
   {"set": {"PATH": {"FQDN": null}}}      changes a resource; null removes a property
@@ -13,6 +14,7 @@ It begins with the resources of world.json and prints its port. Each line of sta
                                          which of them they refuse
 It ends with its standard input.
 """
+import argparse
 import collections
 import copy
 import http.server
@@ -47,10 +49,14 @@ SWITCHES = {
 }
 
 
-def first_world():
-    """The resources of world.json, each with its path. They have what service processors answer, most of which is not read."""
-    text = pathlib.Path(__file__).with_name("world.json").read_text(encoding="utf-8")
-    return {path: {"@odata.id": path, **body} for path, body in json.loads(text).items()}
+def first_world(mockup):
+    """The resources of world.json, each with its path. They have what service processors answer, most of which is not read.
+    Those of the mockup come before them."""
+    world = json.loads(pathlib.Path(__file__).with_name("world.json").read_text(encoding="utf-8"))
+    for file in pathlib.Path(mockup).rglob("index.json") if mockup else []:
+        folder = file.parent.relative_to(mockup).as_posix()
+        world[f"{ROOT}/" + ("" if folder == "." else folder)] = json.loads(file.read_text(encoding="utf-8"))
+    return {path: {"@odata.id": path, **body} for path, body in world.items()}
 
 
 class Schemas:
@@ -91,10 +97,10 @@ class Schemas:
 
 
 class Service:
-    def __init__(self, schemas):
+    def __init__(self, schemas, mockup):
         self.lock = threading.Lock()
         self.switches = dict(SWITCHES)
-        self.world = first_world()
+        self.world = first_world(mockup)
         self.versions = {}
         self.log = []
         self.sessions = {}  # token: (path, requests)
@@ -152,7 +158,8 @@ class Service:
         if self.switches["etag"] == "body":
             body["@odata.etag"] = self.etag(path)
         if path == f"{ROOT}/":
-            body["ProtocolFeaturesSupported"]["ExpandQuery"]["NoLinks"] = self.switches["expand"]
+            features = body.setdefault("ProtocolFeaturesSupported", {})
+            features.setdefault("ExpandQuery", {})["NoLinks"] = self.switches["expand"]
         elif query.startswith("$expand") and "Members" in body:
             body["Members"] = [self.get(each["@odata.id"], "") or each for each in body["Members"]]
         return body
@@ -405,9 +412,15 @@ class Server(http.server.ThreadingHTTPServer):
 
 
 def main():
+    parser = argparse.ArgumentParser()
+    parser.add_argument("certificate")
+    parser.add_argument("key")
+    parser.add_argument("--schemas")
+    parser.add_argument("--mockup")
+    options = parser.parse_args()
     context = ssl.SSLContext(ssl.PROTOCOL_TLS_SERVER)
-    context.load_cert_chain(sys.argv[1], sys.argv[2])
-    service = Service(Schemas(sys.argv[3] if len(sys.argv) > 3 else None))
+    context.load_cert_chain(options.certificate, options.key)
+    service = Service(Schemas(options.schemas), options.mockup)
     Handler.service = service
     server = Server(("127.0.0.1", 0), Handler)
     server.socket = context.wrap_socket(server.socket, server_side=True, do_handshake_on_connect=False)
