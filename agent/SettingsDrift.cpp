@@ -1,4 +1,4 @@
-#include "agent/apply/Drift.h"
+#include "agent/SettingsDrift.h"
 
 #include <algorithm>
 #include <utility>

@@ -24,7 +24,7 @@ using testing::kEth0;
 using ::testing::Not;
 using testing::TestRedfish;
 
-constexpr Patience kShort{milliseconds(1500), milliseconds(6000), milliseconds(300)};
+constexpr Patience kShort{milliseconds(3000), milliseconds(6000), milliseconds(300)};
 
 class ServiceTest : public ::testing::Test {
  protected:

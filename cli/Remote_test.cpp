@@ -83,15 +83,17 @@ class Remote : public testing::Test {
 TestHost* Remote::host_ = nullptr;
 TestServer* Remote::server_ = nullptr;
 
+// The server alone has ZORVA_DNSSettingOrigin, so its CIM_ManagedElement is more.
 TEST_F(Remote, EnumeratesTheSameInEachFormat) {
   for (const char* format : {"table", "json", "mof", "xml"}) {
-    for (const char* name : {"CIM_ManagedElement", "CIM_Dependency", "CIM_Component", "CIM_ElementSettingData"}) {
+    for (const char* name :
+         {"CIM_ManagedSystemElement", "CIM_SettingData", "CIM_Dependency", "CIM_Component", "CIM_ElementSettingData"}) {
       expectSame({"ei", name, "-o", format});
     }
   }
   expectSame({"ei", "zorva_dnsprotocolendpoint", "--property", "hostname", "--property", "EnabledState"});
-  expectSame({"ein", "CIM_ManagedElement"});
-  expectSame({"ein", "CIM_ManagedElement", "-o", "json"});
+  expectSame({"ein", "CIM_ManagedSystemElement"});
+  expectSame({"ein", "CIM_SettingData", "-o", "json"});
 }
 
 TEST_F(Remote, GetsTheSame) {

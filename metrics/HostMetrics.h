@@ -5,7 +5,7 @@
 #include <cstdint>
 #include <vector>
 
-#include "agent/apply/Drift.h"
+#include "agent/SettingsDrift.h"
 #include "agent/tree/TreeSnapshot.h"
 #include "metrics/Exposition.h"
 

@@ -128,7 +128,7 @@ void mendSettings() noexcept {
 
 /// What GET returns.
 http::Pages pagesOf(const Config& config, const std::vector<http::Listener>& listeners, MetricsPage& metrics,
-                     Watchers& watchers) {
+                    Watchers& watchers) {
   http::Pages pages;
   pages.emplace("/metrics", metrics.page());
   pages.emplace("/watch", watchers.page());

@@ -6,7 +6,7 @@
 #include <utility>
 
 #include "agent/Agent.h"
-#include "agent/apply/Drift.h"
+#include "agent/SettingsDrift.h"
 #include "metrics/HostMetrics.h"
 #include "server/Reading.h"
 
