@@ -9,7 +9,8 @@ namespace zorva::util {
 std::size_t utf8Length(std::string_view text) noexcept {
   if (text.empty()) return 0;
   const auto lead = static_cast<unsigned char>(text[0]);
-  const std::size_t length = lead < 0x80 ? 1 : lead >= 0xF0 ? 4 : lead >= 0xE0 ? 3 : 2;
+  if (lead < 0x80) return 1;
+  const std::size_t length = lead >= 0xF0 ? 4 : lead >= 0xE0 ? 3 : 2;
   return text.size() >= length && isUtf8(text.substr(0, length)) ? length : 0;
 }
 

@@ -1,5 +1,6 @@
 #include "cli/output/Text.h"
 
+#include <algorithm>
 #include <clocale>
 #include <cstdint>
 #include <cstdio>
@@ -64,6 +65,12 @@ std::size_t pieceEnd(std::string_view text, std::size_t width) {
   return at;
 }
 
+/// How many bytes at the beginning are characters of one column that are shown as they are. Most texts have no others.
+std::size_t plainLength(std::string_view text) noexcept {
+  const auto isPlain = [](char byte) { return byte >= 0x20 && byte < 0x7F; };
+  return static_cast<std::size_t>(std::find_if_not(text.begin(), text.end(), isPlain) - text.begin());
+}
+
 std::string moreText(std::size_t count) { return " and " + std::to_string(count) + " more"; }
 
 }  // namespace
@@ -71,7 +78,11 @@ std::string moreText(std::size_t count) { return " and " + std::to_string(count)
 std::string printable(std::string_view text) {
   std::string out;
   out.reserve(text.size());
-  while (!text.empty()) {
+  while (true) {
+    const std::size_t plain = plainLength(text);
+    out += text.substr(0, plain);
+    text.remove_prefix(plain);
+    if (text.empty()) return out;
     const std::size_t length = util::utf8Length(text);
     if (length == 0) {
       char escape[8];
@@ -88,17 +99,19 @@ std::string printable(std::string_view text) {
     }
     text.remove_prefix(length);
   }
-  return out;
 }
 
 std::size_t displayWidth(std::string_view text) {
   std::size_t columns = 0;
-  while (!text.empty()) {
+  while (true) {
+    const std::size_t plain = plainLength(text);
+    columns += plain;
+    text.remove_prefix(plain);
+    if (text.empty()) return columns;
     const std::size_t length = util::utf8Length(text);
     columns += length == 0 ? 1 : characterWidth(util::utf8Decode(text));
     text.remove_prefix(length == 0 ? 1 : length);
   }
-  return columns;
 }
 
 std::vector<std::string> wrapped(std::string_view text, std::size_t width) {
