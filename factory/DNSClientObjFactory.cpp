@@ -95,7 +95,7 @@ void setKeys(const CMPIInstance* instance, const DNSClient& dc) {
 }  // namespace
 
 CMPIInstance* DNSClientObjFactory::makeDNSClientInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
-                                                         const DNSClient& dc, const char** properties, bool isObjPath,
+                                                         DNSClient dc, const char** properties, bool isObjPath,
                                                          CMPIStatus* rc) {
   const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " dc=", &dc,
                      " properties=", properties, " isObjPath=", isObjPath, " rc=", rc);
@@ -189,7 +189,7 @@ unsigned short DNSClientObjFactory::getAllDNSServerCMPIObjPaths(const CMPIBroker
 }
 
 CMPIInstance* DNSClientObjFactory::makeDNSServerInstance(const CMPIBroker* broker, const CMPIObjectPath* ref,
-                                                         const DNSServer& ds, const char** properties, bool isObjPath,
+                                                         DNSServer ds, const char** properties, bool isObjPath,
                                                          CMPIStatus* rc) {
   const FlowLog flow(loggerDNSObjFactory, ZV_HERE, " broker=", broker, " ref=", ref, " ds=", &ds,
                      " properties=", properties, " isObjPath=", isObjPath, " rc=", rc);

@@ -43,7 +43,7 @@ class DNSClientObjFactory {
                                              std::vector<CMPIInstance*>& instances, CMPIStatus* status);
   /// An instance with its four keys and the properties on the list. Without a list: all of them, or none if isObjPath
   /// requests only the keys. Null, or an instance without a handle, if none could be made.
-  CMPIInstance* makeDNSClientInstance(const CMPIBroker* broker, const CMPIObjectPath* ref, const DNSClient& dc,
+  CMPIInstance* makeDNSClientInstance(const CMPIBroker* broker, const CMPIObjectPath* ref, DNSClient dc,
                                       const char** properties, bool isObjPath, CMPIStatus* rc);
 
   /// Servers, ZORVA_RemoteServiceAccessPoint, in the order of their addresses; otherwise like the endpoints.
@@ -55,7 +55,7 @@ class DNSClientObjFactory {
   unsigned short getOneDNSServerCMPIInstance(const CMPIBroker* broker, const CMPIObjectPath* objectPath,
                                              CMPIString* key, const char** properties,
                                              std::vector<CMPIInstance*>& instances, CMPIStatus* status);
-  CMPIInstance* makeDNSServerInstance(const CMPIBroker* broker, const CMPIObjectPath* ref, const DNSServer& ds,
+  CMPIInstance* makeDNSServerInstance(const CMPIBroker* broker, const CMPIObjectPath* ref, DNSServer ds,
                                       const char** properties, bool isObjPath, CMPIStatus* rc);
   /// The position in the search order of the server at that path; 1, as for the first server, if it is not known.
   unsigned short getOrderOfAccess(const CMPIBroker* _broker, CMPIObjectPath* dnsServer, CMPIStatus* rc);

@@ -16,12 +16,12 @@ static const std::string loggerDNSClient = "Zorvagent.DNSClient";
 static const char* const spcomputerSystemClass = "ZORVA_SPComputerSystem";
 static const char* const computerSystemClass = "ZORVA_ComputerSystem";
 
-const std::string& DNSClient::getNameFormat() const {
+std::string DNSClient::getNameFormat() {
   nameFormat = "NICName";
   return nameFormat;
 }
 
-const std::string& DNSClient::getOtherTypeDescription() const {
+std::string DNSClient::getOtherTypeDescription() {
   otherTypeDescription = "DNS";
   return otherTypeDescription;
 }

@@ -8,23 +8,23 @@
 
 namespace ZV {
 
-/// A value record. What a getter returns is valid until the record changes. The bool of a setter says whether the value
-/// is usable; it is stored in any case. Numbers that the host does not provide are 0.
+/// A value record; it is copied for every use. The bool of a setter says whether the value is usable; it is stored in
+/// any case. Numbers that the host does not provide are 0.
 class DNSClient {
  public:
-  const std::string& getDNSClientName() const { return dnsClientName; }
-  const std::string& getDNSSCCN() const { return dnsSCCN; }
-  const std::string& getHostName() const { return hostName; }
-  const std::string& getDomainName() const { return domainName; }
-  const std::string& getElementName() const { return elementName; }
+  std::string getDNSClientName() const { return dnsClientName; }
+  std::string getDNSSCCN() const { return dnsSCCN; }
+  std::string getHostName() const { return hostName; }
+  std::string getDomainName() const { return domainName; }
+  std::string getElementName() const { return elementName; }
   unsigned short getprotocolIFType() const { return protocolIFType; }
   unsigned short getEnabledState() const { return enabledState; }
   unsigned short getRequestedState() const { return requestedState; }
-  const std::vector<std::string>& getDNSSuffixesToAppend() const { return dnsSuffixesToAppend; }
+  std::vector<std::string> getDNSSuffixesToAppend() const { return dnsSuffixesToAppend; }
 
-  /// These store their value when they are read. So one record must not be read by several threads at once.
-  const std::string& getNameFormat() const;            ///< "NICName"
-  const std::string& getOtherTypeDescription() const;  ///< "DNS"
+  /// These store their value when it is first read, so they are not const.
+  std::string getNameFormat();            ///< "NICName"
+  std::string getOtherTypeDescription();  ///< "DNS"
 
   bool setDNSClientName(std::string name);
   bool setHostName(std::string name);
@@ -53,10 +53,10 @@ class DNSClient {
  private:
   std::string dnsClientName;
   std::string dnsSCCN;
-  mutable std::string nameFormat;
+  std::string nameFormat;
   unsigned short protocolIFType = 0;
   std::string hostName;
-  mutable std::string otherTypeDescription;
+  std::string otherTypeDescription;
   std::string domainName;
   std::vector<std::string> dnsSuffixesToAppend;
   unsigned short enabledState = 0;

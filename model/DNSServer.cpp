@@ -17,22 +17,22 @@ unsigned short DNSServer::setOrderOfAccess(unsigned short order) {
   return 0;
 }
 
-unsigned short DNSServer::getAccessContext() const {
+unsigned short DNSServer::getAccessContext() {
   accessContext = 3;
   return accessContext;
 }
 
-unsigned short DNSServer::getInfoFormat() const {
+unsigned short DNSServer::getInfoFormat() {
   infoFormat = accessInfo.find(':') != std::string::npos ? 4 : 3;
   return infoFormat;
 }
 
-const std::string& DNSServer::getNameFormat() const {
+std::string DNSServer::getNameFormat() {
   nameFormat = "DNSServer";
   return nameFormat;
 }
 
-const std::string& DNSServer::getElementName() const {
+std::string DNSServer::getElementName() {
   elementName = accessInfo;
   return elementName;
 }

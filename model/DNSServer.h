@@ -7,31 +7,30 @@
 
 namespace ZV {
 
-/// A value record. What a getter returns is valid until the record changes. Numbers that the host does not provide are
-/// 0 until first read.
+/// A value record; it is copied for every use. Numbers that the host does not provide are 0 until first read.
 class DNSServer {
  public:
-  const std::string& getAccessInfo() const { return accessInfo; }
+  std::string getAccessInfo() const { return accessInfo; }
   void setAccessInfo(std::string address) { accessInfo = std::move(address); }
 
   /// The position of the address, from 1, in the list that named it first.
   unsigned short getOrderOfAccess() const { return orderOfAccess; }
   unsigned short setOrderOfAccess(unsigned short order);  ///< always 0
 
-  /// These store their value when they are read. So one record must not be read by several threads at once.
-  unsigned short getAccessContext() const;    ///< 3: DNS Server
-  unsigned short getInfoFormat() const;       ///< 4: IPv6 Address, if the address contains a ":"; else 3: IPv4 Address
-  const std::string& getNameFormat() const;   ///< "DNSServer"
-  const std::string& getElementName() const;  ///< the address
+  /// These store their value when it is first read, so they are not const.
+  unsigned short getAccessContext();  ///< 3: DNS Server
+  unsigned short getInfoFormat();     ///< 4: IPv6 Address, if the address contains a ":"; else 3: IPv4 Address
+  std::string getNameFormat();        ///< "DNSServer"
+  std::string getElementName();       ///< the address
 
  private:
   std::string serverName;  ///< never set: a record is known by its address
-  mutable std::string nameFormat;
+  std::string nameFormat;
   std::string accessInfo;
-  mutable unsigned short accessContext = 0;
-  mutable unsigned short infoFormat = 0;
+  unsigned short accessContext = 0;
+  unsigned short infoFormat = 0;
   unsigned short orderOfAccess = 1;
-  mutable std::string elementName;
+  std::string elementName;
 };
 
 /// Adds a record for each server address of the host to dnsServerMap, keyed by the address; the map is not emptied
