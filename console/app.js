@@ -163,7 +163,7 @@ class App {
   #answers() {
     if (this.banner.hidden) return;
     this.banner.hidden = true;
-    this.tell(t("back_again"));
+    if (this.message.hidden) this.tell(t("back_again"));  // what a change came to is not replaced
   }
 
   #failed(error) {
