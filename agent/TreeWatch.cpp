@@ -20,7 +20,7 @@ constexpr milliseconds kBetweenReadings{50};
 
 int asTimeout(std::optional<milliseconds> time) {
   if (!time.has_value()) return -1;
-  return static_cast<int>(std::clamp<milliseconds::rep>(time->count(), 0, 24 * 60 * 60 * 1000));
+  return static_cast<int>(std::clamp(*time, milliseconds(0), milliseconds(std::chrono::hours(24))).count());
 }
 
 const Config& checkedConfig() {
