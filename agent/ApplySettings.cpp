@@ -20,15 +20,6 @@ Applier makeApplier(OverlayValues overlay) {
   return {config.dataDir, [] { return Runtime::instance().lookAtSource(); }, std::move(overlay), config.bmc.file};
 }
 
-// A wrong overlay must not keep anybody from taking changes back.
-OverlayValues overlayIfGood() {
-  try {
-    return Runtime::instance().overlay().read();
-  } catch (const ConfigError&) {
-    return {};
-  }
-}
-
 }  // namespace
 
 std::vector<ApplyResult> applySettings(const std::vector<std::string>& interfaces, const ApplyOptions& options) {
@@ -36,10 +27,11 @@ std::vector<ApplyResult> applySettings(const std::vector<std::string>& interface
 }
 
 std::vector<ApplyResult> revertSettings(const std::vector<std::string>& interfaces, const ApplyOptions& options) {
-  return makeApplier(overlayIfGood()).revert(interfaces, options);
+  // A wrong overlay must not keep anybody from taking changes back.
+  return makeApplier(Runtime::instance().overlay().readIfGood()).revert(interfaces, options);
 }
 
-std::vector<ApplyResult> endTrial() { return makeApplier(overlayIfGood()).endTrial(); }
+std::vector<ApplyResult> endTrial() { return makeApplier(Runtime::instance().overlay().readIfGood()).endTrial(); }
 
 std::optional<std::chrono::system_clock::time_point> pendingTrial() { return pendingTrialIn(configOfHost().dataDir); }
 

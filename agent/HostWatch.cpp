@@ -1,11 +1,7 @@
 #include "agent/HostWatch.h"
 
-#include <dirent.h>
-
 #include <algorithm>
 #include <array>
-#include <cstdio>
-#include <ctime>
 #include <iterator>
 #include <map>
 #include <string_view>
@@ -15,7 +11,9 @@
 #include "agent/config/CurrentConfig.h"
 #include "agent/files/DirectoryWatch.h"
 #include "agent/files/KeyValues.h"
+#include "agent/files/SettingFiles.h"
 #include "agent/tree/TreeJson.h"
+#include "util/TimeText.h"
 
 namespace zorva::agent {
 namespace {
@@ -26,7 +24,6 @@ constexpr const char* kInterface = "interface";
 constexpr const char* kKernel = "kernel";
 constexpr const char* kOverlayFile = "overlay.json";
 constexpr const char* kResolvConf = "/etc/resolv.conf";
-constexpr std::string_view kFilePrefix = "ifcfg-";
 constexpr std::array<std::string_view, 5> kFileKeys{"HOSTNAME", "DOMAINNAME", "DNSSERVERS", "DNSSUFFIXES",
                                                     "CONFIG_NAME"};
 // Of a directory with more, the rest is not watched.
@@ -44,19 +41,18 @@ bool isOfDns(PropertyNumber number) {
 std::string setterOf(const TreeSnapshot& tree, const Node& node, PropertyNumber number) {
   const Property* property = node.find(number);
   if (property != nullptr && property->overlaid) return kOverlayFile;
-  const Node& port = tree.parent(node);
-  if (node.isServiceProcessor() || port.isServiceProcessor() || tree.parent(port).isServiceProcessor())
+  if (node.isServiceProcessor() || tree.parent(node).isServiceProcessor() || tree.systemOf(node).isServiceProcessor()) {
     return kBmcOwner;
+  }
   if (number >= kResolverServers && number <= kResolverOptions) return kResolvConf;
   if (!isOfDns(number)) return kKernel;
-  const std::string* owner = node.text(kDnsOwner);
-  return owner == nullptr ? std::string() : *owner;
+  return node.textOrEmpty(kDnsOwner);
 }
 
 /// The settings in a file of an interface, by key.
 using FileSettings = std::map<std::string, std::string>;
 /// By the name of the interface.
-using SettingFiles = std::map<std::string, FileSettings>;
+using SettingsOfFiles = std::map<std::string, FileSettings>;
 
 FileSettings settingsIn(const std::string& path) {
   FileSettings settings;
@@ -67,14 +63,11 @@ FileSettings settingsIn(const std::string& path) {
   return settings;
 }
 
-SettingFiles filesIn(const std::string& directory) {
-  SettingFiles files;
-  const std::unique_ptr<DIR, int (*)(DIR*)> open(::opendir(directory.c_str()), ::closedir);
-  if (open == nullptr) return files;
-  while (const dirent* entry = ::readdir(open.get())) {
-    const std::string_view name = entry->d_name;
-    if (!name.starts_with(kFilePrefix) || files.size() >= kMostFiles) continue;
-    files.emplace(name.substr(kFilePrefix.size()), settingsIn(directory + entry->d_name));
+SettingsOfFiles filesIn(const std::string& directory) {
+  SettingsOfFiles files;
+  for (const std::string& interface : findSettingFiles(directory).interfaces) {
+    if (files.size() >= kMostFiles) break;
+    files.emplace(interface, settingsIn(directory + settingFileName(interface)));
   }
   return files;
 }
@@ -96,7 +89,7 @@ class Comparison {
     }
   }
 
-  void compare(const std::string& system, const SettingFiles& before, const SettingFiles& after) {
+  void compare(const std::string& system, const SettingsOfFiles& before, const SettingsOfFiles& after) {
     for (const auto& [interface, settings] : after) {
       const auto old = before.find(interface);
       compareFile(system, interface, old == before.end() ? FileSettings() : old->second, settings);
@@ -117,7 +110,7 @@ class Comparison {
   }
 
   static std::string systemOf(const TreeSnapshot& tree, const Node& node) {
-    const Node& system = isInterface(node) ? tree.parent(tree.parent(node)) : node;
+    const Node& system = isInterface(node) ? tree.systemOf(node) : node;
     return system.isServiceProcessor() ? system.name() : tree.systemName();
   }
 
@@ -160,25 +153,13 @@ class Comparison {
       const Value had = valueOf(before, key);
       const Value has = valueOf(after, key);
       if (had == has) continue;
-      changes_.push_back({now_, system, interface, "ifcfg." + key, had, has, std::string(kFilePrefix) + interface});
+      changes_.push_back({now_, system, interface, "ifcfg." + key, had, has, settingFileName(interface)});
     }
   }
 
   std::vector<HostChange>& changes_;
   const std::chrono::system_clock::time_point now_ = std::chrono::system_clock::now();
 };
-
-// RFC 3339, in UTC, with milliseconds.
-std::string timeText(std::chrono::system_clock::time_point time) {
-  const auto sinceEpoch = std::chrono::duration_cast<std::chrono::milliseconds>(time.time_since_epoch());
-  const std::time_t seconds = sinceEpoch.count() / 1000;
-  std::tm parts{};
-  ::gmtime_r(&seconds, &parts);
-  char text[64];
-  const std::size_t length = std::strftime(text, sizeof text, "%Y-%m-%dT%H:%M:%S", &parts);
-  std::snprintf(text + length, sizeof text - length, ".%03dZ", static_cast<int>(sinceEpoch.count() % 1000));
-  return text;
-}
 
 JsonValue textOrNull(const std::string& text) { return text.empty() ? JsonValue() : JsonValue::ofText(text); }
 
@@ -191,7 +172,7 @@ JsonValue valueOrNull(const std::optional<PropertyValue>& value) {
 std::string jsonLine(const HostChange& change) {
   JsonValue line = JsonValue::object();
   line.add("version", JsonValue::ofNumber(1));
-  line.add("time", JsonValue::ofText(timeText(change.time)));
+  line.add("time", JsonValue::ofText(util::utcText(change.time)));
   line.add("system", JsonValue::ofText(change.system));
   line.add("interface", textOrNull(change.interface));
   line.add("property", JsonValue::ofText(change.property));
@@ -206,7 +187,7 @@ struct HostWatch::State {
   DirectoryWatch directory;
   std::string dataDir = CurrentConfig::instance().get().dataDir;
   std::shared_ptr<const TreeSnapshot> tree;
-  SettingFiles files;
+  SettingsOfFiles files;
 
   bool filesMayHaveChanged() {
     const bool changed = directory.changed();
@@ -227,7 +208,7 @@ std::vector<HostChange> HostWatch::changes() {
   const std::shared_ptr<const TreeSnapshot> before = std::exchange(state_->tree, tree);
   if (before != nullptr && before != tree) comparison.compare(*before, *tree);
   if (!state_->filesMayHaveChanged()) return changes;
-  const SettingFiles filesBefore = std::exchange(state_->files, filesIn(state_->dataDir));
+  const SettingsOfFiles filesBefore = std::exchange(state_->files, filesIn(state_->dataDir));
   if (before != nullptr) comparison.compare(tree->systemName(), filesBefore, state_->files);
   return changes;
 }

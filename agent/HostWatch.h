@@ -19,8 +19,8 @@ struct HostChange {
   std::chrono::system_clock::time_point time;  ///< when it was seen
   std::string system;                          ///< the name of the host, or of the node of a service processor
   std::string interface;                       ///< empty for what belongs to no interface
-  std::string
-      property;  ///< as in the JSON tree; "ifcfg.DNSSERVERS" of a file of settings; "interface" if it came or went
+  /// As in the JSON tree; "ifcfg.DNSSERVERS" of a file of settings; "interface" if it came or went.
+  std::string property;
   std::optional<PropertyValue> before;  ///< nothing: there was none
   std::optional<PropertyValue> after;   ///< nothing: there is none any more
   std::string by;                       ///< the owner of the value, "overlay.json", a file, "kernel"; empty: not known

@@ -7,6 +7,7 @@
 #include "agent/apply/HostDns.h"
 #include "agent/apply/WantedSettings.h"
 #include "agent/config/CurrentConfig.h"
+#include "agent/sources/ResolvConf.h"
 #include "util/Names.h"
 
 namespace zorva::agent {
@@ -14,14 +15,6 @@ namespace {
 
 using namespace ZV::NodeLexicon;
 using util::sameName;
-
-// The C library asks no more servers of /etc/resolv.conf.
-constexpr std::size_t kServersOfResolvConf = 3;
-
-StringList listOf(const Node& node, PropertyNumber number) {
-  const StringList* list = node.list(number);
-  return list == nullptr ? StringList() : *list;
-}
 
 StringList ipv4First(StringList servers) {
   std::stable_partition(servers.begin(), servers.end(),
@@ -32,8 +25,8 @@ StringList ipv4First(StringList servers) {
 bool sameServers(StringList wanted, const Node& node) {
   const std::string* owner = node.text(kDnsOwner);
   const bool isResolvConf = owner != nullptr && *owner == kResolvConfOwner;
-  if (isResolvConf && wanted.size() > kServersOfResolvConf) wanted.resize(kServersOfResolvConf);
-  return ipv4First(std::move(wanted)) == ipv4First(listOf(node, PROP_DNS_SERVER_ADDRESSES));
+  if (isResolvConf && wanted.size() > kMostAskedServers) wanted.resize(kMostAskedServers);
+  return ipv4First(std::move(wanted)) == ipv4First(node.listOrEmpty(PROP_DNS_SERVER_ADDRESSES));
 }
 
 bool contains(const StringList& names, const std::string& name) {
@@ -42,7 +35,7 @@ bool contains(const StringList& names, const std::string& name) {
 
 // Some owners show the domain as the first suffix.
 bool sameSuffixes(const WantedSettings& wanted, const Node& node) {
-  StringList has = listOf(node, PROP_DNS_SUFFIXES);
+  StringList has = node.listOrEmpty(PROP_DNS_SUFFIXES);
   if (wanted.domain.has_value() && !has.empty() && sameName(has.front(), *wanted.domain) &&
       !contains(*wanted.suffixes, *wanted.domain)) {
     has.erase(has.begin());
@@ -51,8 +44,7 @@ bool sameSuffixes(const WantedSettings& wanted, const Node& node) {
 }
 
 bool hasDomain(const std::string& domain, const Node& node) {
-  const std::string* own = node.text(PROP_DOMAIN_NAME);
-  return sameName(own == nullptr ? std::string() : *own, domain) || contains(listOf(node, PROP_DNS_SUFFIXES), domain);
+  return sameName(node.textOrEmpty(PROP_DOMAIN_NAME), domain) || contains(node.listOrEmpty(PROP_DNS_SUFFIXES), domain);
 }
 
 SettingsDrift driftOf(const std::string& interface, const WantedSettings& read, const Node& node) {
@@ -64,26 +56,17 @@ SettingsDrift driftOf(const std::string& interface, const WantedSettings& read, 
   return drift;
 }
 
-// A wrong overlay counts as none, as it does for the tree.
-OverlayValues overlayIfReadable() {
-  try {
-    return Runtime::instance().overlay().read();
-  } catch (const ConfigError&) {
-    return {};
-  }
-}
-
 }  // namespace
 
 std::vector<SettingsDrift> settingsDrift() {
   const std::shared_ptr<const TreeSnapshot> tree = Runtime::instance().lookAtSource();
   const std::string& dataDir = CurrentConfig::instance().get().dataDir;
-  const OverlayValues overlay = overlayIfReadable();
+  const OverlayValues overlay = Runtime::instance().overlay().readIfGood();  // as the tree takes it
   std::vector<SettingsDrift> drifts;
   for (const Node& node : tree->nodes()) {
     const std::string* interface = node.text(PROP_NAME);
     if (node.type() != NodeType::NetworkIPConfig || interface == nullptr) continue;
-    if (tree->parent(tree->parent(node)).isServiceProcessor()) continue;
+    if (tree->systemOf(node).isServiceProcessor()) continue;
     const auto wanted = readWanted(dataDir, *interface, overlay, node.path());
     if (!wanted) {
       drifts.push_back({*interface, true, true, true});

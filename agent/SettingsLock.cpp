@@ -11,6 +11,7 @@
 
 #include "agent/files/FileLock.h"
 #include "agent/files/Rewrite.h"
+#include "agent/files/SettingFiles.h"
 #include "agent/log/LogOutput.h"
 #include "util/FileError.h"
 #include "util/ReadFile.h"
@@ -55,7 +56,7 @@ util::FileDescriptor openForRead(const std::string& directory, const char* name)
 }
 
 std::string interfaceFile(const std::string& directory, const std::string& interface) {
-  return directory + "ifcfg-" + interface;
+  return directory + settingFileName(interface);
 }
 
 bool canBeAName(const std::string& interface) {

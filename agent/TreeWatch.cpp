@@ -65,10 +65,11 @@ void TreeWatch::wait(std::vector<pollfd>& others, std::optional<milliseconds> lo
   if (calm.count() > 0 && ::poll(others.data(), others.size(), asTimeout(calm)) > 0) return;
   Wakers wakers;
   // A source that could not be read has nothing yet that reports a change.
-  if (state.latest != nullptr)
+  if (state.latest != nullptr) {
     state.source->addWakers(wakers);
-  else
+  } else {
     wakers.addDeadline(kLooksForTheUnreported);
+  }
   wakers.addOrLook(state.overlay.descriptor());
   if (longest.has_value()) wakers.addDeadline(*longest);
   std::vector<pollfd> all = others;

@@ -1,4 +1,4 @@
-#include "frontend/SettingFiles.h"
+#include "agent/files/SettingFiles.h"
 
 #include <dirent.h>
 #include <sys/stat.h>
@@ -8,9 +8,7 @@
 #include <memory>
 #include <string_view>
 
-#include "agent/Agent.h"
-
-namespace zorva::frontend {
+namespace zorva::agent {
 
 namespace {
 
@@ -23,13 +21,14 @@ bool exists(const std::string& path) {
 
 }  // namespace
 
+std::string settingFileName(std::string_view interface) { return std::string(kPrefix) + std::string(interface); }
+
 bool SettingFiles::has(const std::string& interface) const {
   return std::binary_search(interfaces.begin(), interfaces.end(), interface);
 }
 
-SettingFiles findSettingFiles() {
+SettingFiles findSettingFiles(const std::string& directory) {
   SettingFiles files;
-  const std::string directory = zorva::agent::dataDirectory();
   const std::unique_ptr<DIR, int (*)(DIR*)> open(::opendir(directory.c_str()), ::closedir);
   if (open == nullptr) {
     files.error = errno == ENOENT ? 0 : errno;
@@ -44,4 +43,4 @@ SettingFiles findSettingFiles() {
   return files;
 }
 
-}  // namespace zorva::frontend
+}  // namespace zorva::agent

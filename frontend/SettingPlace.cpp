@@ -11,6 +11,7 @@
 #include <exception>
 
 #include "agent/Agent.h"
+#include "agent/files/SettingFiles.h"
 #include "frontend/SettingsClaims.h"
 #include "util/Names.h"
 #include "util/ReadFile.h"
@@ -57,7 +58,9 @@ std::optional<std::string> missingDirectory() {
   return "the data directory " + directory + " does not exist";
 }
 
-std::string fileOf(const std::string& interface) { return zorva::agent::dataDirectory() + "ifcfg-" + interface; }
+std::string fileOf(const std::string& interface) {
+  return zorva::agent::dataDirectory() + zorva::agent::settingFileName(interface);
+}
 
 std::optional<std::string> fileAbsence(const std::string& interface) {
   if (interface.empty()) return "the interface has no name, and so no file";

@@ -102,9 +102,8 @@ std::string interfaceOfId(std::string_view instanceId) {
 std::optional<std::string> interfaceOfHostSettings(const zorva::agent::TreeSnapshot& tree) {
   for (const zorva::agent::Node& node : tree.nodes()) {
     if (node.type() != zorva::agent::NodeType::NetworkIPConfig) continue;
-    if (tree.parent(tree.parent(node)).description() == "BMC") continue;
-    const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
-    return name == nullptr ? std::string() : *name;
+    if (tree.systemOf(node).isServiceProcessor()) continue;
+    return node.textOrEmpty(ZV::NodeLexicon::PROP_NAME);
   }
   return std::nullopt;
 }

@@ -35,7 +35,7 @@ Interfaces interfacesOf(const TreeSnapshot& tree) {
   for (const Node& node : tree.nodes()) {
     const std::string* name = node.text(PROP_NAME);
     if (node.type() != agent::NodeType::NetworkIPConfig || name == nullptr) continue;
-    const std::string_view system = tree.parent(tree.parent(node)).isServiceProcessor() ? kBmc : kHost;
+    const std::string_view system = tree.systemOf(node).isServiceProcessor() ? kBmc : kHost;
     // Names that the label cuts would make two series of one name.
     const std::string_view key = std::string_view(*name).substr(0, Exposition::kLongestLabel / 4);
     if (!seen.insert({system, key}).second) continue;
@@ -46,11 +46,6 @@ Interfaces interfacesOf(const TreeSnapshot& tree) {
     }
   }
   return result;
-}
-
-std::string_view textOf(const Node& node, agent::PropertyNumber number) {
-  const std::string* text = node.text(number);
-  return text == nullptr ? std::string_view() : *text;
 }
 
 std::size_t sizeOf(const Node& node, agent::PropertyNumber number) {
@@ -81,7 +76,7 @@ std::size_t writeServers(Exposition& out, const Interfaces& interfaces) {
                   {"interface", each.name},
                   {"order", std::to_string(i + 1)},
                   {"address", (*servers)[i]},
-                  {"owner", textOf(*each.node, agent::kDnsOwner)}},
+                  {"owner", each.node->textOrEmpty(agent::kDnsOwner)}},
                  1);
     }
     written += most;

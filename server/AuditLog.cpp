@@ -14,24 +14,13 @@
 
 #include "http/Log.h"
 #include "util/ReadFile.h"
+#include "util/TimeText.h"
 
 namespace zorva::server {
 
 namespace {
 
 constexpr std::chrono::seconds kForTheRest{2};
-
-/// "2026-11-22T12:00:00.123Z"
-std::string now() {
-  timespec time{};
-  ::clock_gettime(CLOCK_REALTIME, &time);
-  tm parts{};
-  ::gmtime_r(&time.tv_sec, &parts);
-  char text[40];
-  const std::size_t size = std::strftime(text, sizeof text, "%Y-%m-%dT%H:%M:%S", &parts);
-  std::snprintf(text + size, sizeof text - size, ".%03dZ", static_cast<int>(time.tv_nsec / 1'000'000));
-  return text;
-}
 
 std::string missing(std::size_t count) {
   return std::to_string(count) + " lines of the audit were left out here: too many came at once";
@@ -139,7 +128,9 @@ AuditLog::Writer auditFile(const std::string& path) {
   if (::fstat(file->get(), &about) != 0 || !S_ISREG(about.st_mode)) {
     throw std::runtime_error(path + ": the audit's lines need a regular file");
   }
-  return [file](const std::string& line) { writeAll(file->get(), now() + " " + line + "\n"); };
+  return [file](const std::string& line) {
+    writeAll(file->get(), util::utcText(std::chrono::system_clock::now()) + " " + line + "\n");
+  };
 }
 
 AuditLog::Writer auditInLog() {

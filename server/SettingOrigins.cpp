@@ -5,7 +5,8 @@
 #include <utility>
 
 #include "agent/Agent.h"
-#include "frontend/SettingFiles.h"
+#include "agent/files/SettingFiles.h"
+#include "agent/interface/PlatformUtilities.h"
 #include "frontend/SettingsClaims.h"
 #include "host/HostProvider.h"
 
@@ -43,10 +44,10 @@ agent::StringList setProperties(const Node& node) {
   return names;
 }
 
-HostObject originOf(const std::string& id, const std::string& interface, const frontend::SettingFiles& files) {
+HostObject originOf(const std::string& id, const std::string& interface, const agent::SettingFiles& files) {
   HostObject origin{kClass, {{"InstanceID", id}}, {}};
   if (interface.empty()) return origin;
-  const std::string file = "ifcfg-" + interface;
+  const std::string file = agent::settingFileName(interface);
   origin.properties.push_back({"FileName", file});
   if (files.has(interface)) origin.properties.push_back({"File", file});
   return origin;
@@ -60,7 +61,7 @@ void addOwner(HostObject& origin, const Node& node) {
 }
 
 HostObject originOfInterface(const Node& node, const std::string& name, bool isServiceProcessor,
-                             const frontend::SettingFiles& files) {
+                             const agent::SettingFiles& files) {
   HostObject origin = originOf((isServiceProcessor ? "BMC%" : "Computer%") + name, name, files);
   addOwner(origin, node);
   const agent::StringList set = setProperties(node);
@@ -68,10 +69,9 @@ HostObject originOfInterface(const Node& node, const std::string& name, bool isS
   return origin;
 }
 
-HostObject originOfHost(const agent::TreeSnapshot& tree, const frontend::SettingFiles& files) {
-  const std::string& configured = agent::currentConfig().systemName;
-  const std::string& name = configured.empty() ? tree.systemName() : configured;
-  HostObject origin = originOf("dnsgen1:" + name, frontend::interfaceOfHostSettings(tree).value_or(""), files);
+HostObject originOfHost(const agent::TreeSnapshot& tree, const agent::SettingFiles& files) {
+  HostObject origin =
+      originOf("dnsgen1:" + ZV::getSystemName(), frontend::interfaceOfHostSettings(tree).value_or(""), files);
   for (const Node& node : tree.nodes()) {
     if (node.type() != agent::NodeType::System || node.isServiceProcessor()) continue;
     addOwner(origin, node);
@@ -95,13 +95,13 @@ CMPIInstanceMI* create(const CMPIBroker* broker, const CMPIContext*, CMPIStatus*
 }  // namespace
 
 std::vector<HostObject> settingOrigins(const agent::TreeSnapshot& tree) {
-  const frontend::SettingFiles files = frontend::findSettingFiles();
+  const agent::SettingFiles files = agent::findSettingFiles(agent::dataDirectory());
   std::vector<HostObject> origins;
   std::set<std::pair<bool, std::string>> seen;
   for (const Node& node : tree.nodes()) {
     const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
     if (node.type() != agent::NodeType::NetworkIPConfig || name == nullptr) continue;
-    const bool isServiceProcessor = tree.parent(tree.parent(node)).isServiceProcessor();
+    const bool isServiceProcessor = tree.systemOf(node).isServiceProcessor();
     if (!seen.emplace(isServiceProcessor, *name).second) continue;
     origins.push_back(originOfInterface(node, *name, isServiceProcessor, files));
   }

@@ -20,16 +20,6 @@ constexpr const char* kRoot = "";  // of all paths
 constexpr const char* kBusSocket = "/run/dbus/system_bus_socket";
 constexpr std::size_t kLargestHosts = std::size_t{64} << 10;
 
-StringList listOf(const Node& node, PropertyNumber number) {
-  const StringList* list = node.list(number);
-  return list == nullptr ? StringList() : *list;
-}
-
-std::string textOf(const Node& node, PropertyNumber number) {
-  const std::string* text = node.text(number);
-  return text == nullptr ? std::string() : *text;
-}
-
 bool sameNames(const StringList& left, const StringList& right) {
   return std::equal(left.begin(), left.end(), right.begin(), right.end(), util::sameName);
 }
@@ -64,15 +54,15 @@ bool HostDns::mayLookAgain() {
 // The tree is read after the owners are asked, and one of them may have ended in between.
 bool HostDns::isInTree(const ChosenOwner& owner, const HostInterface& interface) const {
   const Node* node = nodeOf(interface);
-  return !owner.speaks || node == nullptr || textOf(*node, kDnsOwner) == owner.name;
+  return !owner.speaks || node == nullptr || node->textOrEmpty(kDnsOwner) == owner.name;
 }
 
 Expected<ChosenOwner, Refusal> HostDns::ownerOfBmc(const HostInterface& interface) const {
   const Node* node = nodeOf(interface);
-  if (node == nullptr || textOf(*node, kDnsOwner) != kBmcOwner) {
+  if (node == nullptr || node->textOrEmpty(kDnsOwner) != kBmcOwner) {
     return unexpected(interface.name + " is not kept by zorva-bmc, so it cannot be changed");
   }
-  return ChosenOwner{kBmcOwner, textOf(*node, kDnsProfile), true};
+  return ChosenOwner{kBmcOwner, node->textOrEmpty(kDnsProfile), true};
 }
 
 Expected<ChosenOwner, Refusal> HostDns::ownerOf(const HostInterface& interface) {
@@ -102,7 +92,7 @@ std::vector<HostInterface> HostDns::interfaces() const {
   std::vector<HostInterface> interfaces;
   for (const Node& node : tree_->nodes()) {
     if (node.type() != NodeType::NetworkIPConfig) continue;
-    const std::string name = textOf(node, PROP_NAME);
+    const std::string name = node.textOrEmpty(PROP_NAME);
     const bool isOfBmc = tree_->parent(tree_->parent(node)).isServiceProcessor();
     interfaces.push_back(isOfBmc ? interfaceOfBmc(node, name) : interfaceOf(name, node.path()));
   }
@@ -114,7 +104,7 @@ std::vector<HostInterface> HostDns::named(const std::string& name) const {
   for (HostInterface& interface : interfaces()) {
     const Node& node = *nodeOf(interface);
     const bool isOfBmc =
-        interface.isOfBmc && textOf(node, PROP_NAME) == (name.starts_with("BMC%") ? name.substr(4) : "");
+        interface.isOfBmc && node.textOrEmpty(PROP_NAME) == (name.starts_with("BMC%") ? name.substr(4) : "");
     if (interface.name == name || interface.settingsName == name || isOfBmc) found.push_back(std::move(interface));
   }
   return found;
@@ -146,26 +136,26 @@ DnsTarget HostDns::targetFor(const HostInterface& interface, const std::string& 
   DnsTarget target{interface.name, interface.link.index, profile, {}, {}, interface.name};
   const Node* node = nodeOf(interface);
   if (node == nullptr) return target;
-  target.zone = textOf(*node, PROP_NAME);
-  target.serversInFull = listOf(*node, kDnsServersInFull);
-  target.routingDomains = listOf(*node, kDnsRoutingDomains);
+  target.zone = node->textOrEmpty(PROP_NAME);
+  target.serversInFull = node->listOrEmpty(kDnsServersInFull);
+  target.routingDomains = node->listOrEmpty(kDnsRoutingDomains);
   return target;
 }
 
 ShownDns HostDns::shown(const HostInterface& interface, const std::string& owner) const {
   ShownDns shown;
   const Node* node = nodeOf(interface);
-  if (node == nullptr || textOf(*node, kDnsOwner) != owner) {
+  if (node == nullptr || node->textOrEmpty(kDnsOwner) != owner) {
     if (owner != kResolvConfOwner) shown.domain = ownDomain();
     return shown;
   }
-  shown.lists = {listOf(*node, PROP_DNS_SERVER_ADDRESSES), listOf(*node, PROP_DNS_SUFFIXES)};
+  shown.lists = {node->listOrEmpty(PROP_DNS_SERVER_ADDRESSES), node->listOrEmpty(PROP_DNS_SUFFIXES)};
   if (owner != kResolvConfOwner) {
-    shown.domain = textOf(*node, PROP_DOMAIN_NAME);
+    shown.domain = node->textOrEmpty(PROP_DOMAIN_NAME);
     return shown;
   }
   // The servers that the C library passes over are in the file as well.
-  const StringList more = listOf(tree_->parent(tree_->parent(*node)), kResolverNotAsked);
+  const StringList more = tree_->systemOf(*node).listOrEmpty(kResolverNotAsked);
   shown.lists.servers.insert(shown.lists.servers.end(), more.begin(), more.end());
   return shown;
 }

@@ -6,6 +6,7 @@
 #include <utility>
 
 #include "agent/files/KeyValues.h"
+#include "agent/files/SettingFiles.h"
 #include "agent/sources/DnsFacts.h"
 #include "agent/tree/IpAddress.h"
 #include "agent/tree/TreeJson.h"
@@ -114,7 +115,7 @@ std::string settleList(std::optional<StringList>& list, PropertyNumber property,
 }  // namespace
 
 std::string settingsFileOf(const std::string& dataDir, const std::string& interface) {
-  return dataDir + "ifcfg-" + interface;
+  return dataDir + settingFileName(interface);
 }
 
 Expected<WantedSettings, std::string> readWanted(const std::string& dataDir, const std::string& interface,

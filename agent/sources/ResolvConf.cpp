@@ -14,7 +14,6 @@
 namespace zorva::agent {
 namespace {
 
-constexpr std::size_t kMostAsked = 3;
 constexpr std::string_view kBlanks = " \t";
 
 // Up to the line feed; what follows a NUL is not seen by a resolver that is written in C.
@@ -60,7 +59,7 @@ std::string serverIn(std::string_view word) {
 void addServer(ResolvConf& conf, std::string_view value) {
   const std::string server = serverIn(takeWord(value));
   if (server.empty()) return;
-  StringList& list = conf.servers.size() < kMostAsked ? conf.servers : conf.notAsked;
+  StringList& list = conf.servers.size() < kMostAskedServers ? conf.servers : conf.notAsked;
   if (list.size() < kMostDnsValues) list.push_back(server);
 }
 

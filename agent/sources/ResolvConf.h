@@ -2,6 +2,7 @@
 
 // What the host's resolver configuration says.
 
+#include <cstddef>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -9,6 +10,9 @@
 #include "agent/tree/Node.h"
 
 namespace zorva::agent {
+
+/// The C library asks no more servers of /etc/resolv.conf.
+inline constexpr std::size_t kMostAskedServers = 3;
 
 /// A resolv.conf(5) as glibc takes it, to the letter: a keyword counts at the very beginning of a line and with a blank
 /// after it; of "domain" and "search" the last one counts; a line's end is a line feed alone, so that a carriage return

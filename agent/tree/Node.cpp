@@ -33,6 +33,18 @@ const StringList* Node::list(PropertyNumber number) const {
   return list == nullptr ? nullptr : list->get();
 }
 
+const std::string& Node::textOrEmpty(PropertyNumber number) const {
+  static const std::string none;
+  const std::string* value = text(number);
+  return value == nullptr ? none : *value;
+}
+
+const StringList& Node::listOrEmpty(PropertyNumber number) const {
+  static const StringList none;
+  const StringList* value = list(number);
+  return value == nullptr ? none : *value;
+}
+
 const AddressList& Node::addresses() const {
   static const AddressList none;
   const auto* list = valueOf<SharedAddresses>(find(kAddresses));

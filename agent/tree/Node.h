@@ -121,6 +121,10 @@ class ZORVA_AGENT_API Node {
   const unsigned int* number(PropertyNumber number) const;
   const StringList* list(PropertyNumber number) const;
 
+  /// The same, or an empty one.
+  const std::string& textOrEmpty(PropertyNumber number) const;
+  const StringList& listOrEmpty(PropertyNumber number) const;
+
   /// The addresses of the interface, in the kernel's order; empty if none are known.
   const AddressList& addresses() const;
 

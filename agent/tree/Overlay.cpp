@@ -91,6 +91,14 @@ OverlayValues Overlay::read() const {
   return valuesFromJson(parseJson(file.text, file_), file_);
 }
 
+OverlayValues Overlay::readIfGood() const {
+  try {
+    return read();
+  } catch (const ConfigError&) {
+    return {};
+  }
+}
+
 void Overlay::set(const std::string& path, PropertyNumber property, const std::optional<PropertyValue>& value) const {
   const FileLock lock(directory_ + kLockName);
   OverlayValues values = read();

@@ -37,6 +37,9 @@ class Overlay {
   /// OverlayUnreadable if the reason is temporary.
   OverlayValues read() const;
 
+  /// The same; nothing if the file is wrong or cannot be read.
+  OverlayValues readIfGood() const;
+
   /// Stores a value, or removes it if none is given. Throws std::runtime_error, with one line, if the file cannot be
   /// written, and ConfigError if it is wrong; the old file is then unchanged.
   void set(const std::string& path, PropertyNumber property, const std::optional<PropertyValue>& value) const;

@@ -31,6 +31,9 @@ class ZORVA_AGENT_API TreeSnapshot {
   /// The parent of a node of this snapshot; the root is its own.
   const Node& parent(const Node& node) const { return nodes_[node.parentIndex()]; }
 
+  /// The system that an interface, a node of type NetworkIPConfig, belongs to.
+  const Node& systemOf(const Node& interface) const { return parent(parent(interface)); }
+
   /// The children of a node of this snapshot, in order.
   std::vector<const Node*> children(const Node& node) const;
 

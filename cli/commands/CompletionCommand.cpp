@@ -163,7 +163,8 @@ void addInterfaces(const Globals& globals, std::vector<std::string>& words) {
 /// Those that are gone and have a file.
 void addOrphans(const Globals& globals, std::vector<std::string>& words) {
   const Session session(globals);
-  const std::vector<std::string> orphans = orphansAmong(findSettingFiles(), *session.tree());
+  const std::vector<std::string> orphans =
+      orphansAmong(findSettingFiles(zorva::agent::dataDirectory()), *session.tree());
   words.insert(words.end(), orphans.begin(), orphans.end());
 }
 

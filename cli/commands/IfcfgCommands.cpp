@@ -102,7 +102,7 @@ ListedFile listed(const std::string& interface, bool isOrphan) {
 }
 
 std::vector<ListedFile> listedFiles(const Session& session) {
-  const SettingFiles files = findSettingFiles();
+  const SettingFiles files = findSettingFiles(zorva::agent::dataDirectory());
   if (files.error != 0) {
     throw Failure(ExitCode::Failed,
                   printable(zorva::agent::dataDirectory()) + ": cannot be read: " + std::strerror(files.error));
@@ -129,7 +129,8 @@ void listInterfaceFiles(const Globals& globals) {
   }
   Table table({"FILE", "INTERFACE", "KEYS"});
   for (const ListedFile& file : files) {
-    table.add({"ifcfg-" + file.interface, file.isOrphan ? Cell("gone: an orphan", Style::Bad) : Cell(file.interface),
+    table.add({zorva::agent::settingFileName(file.interface),
+               file.isOrphan ? Cell("gone: an orphan", Style::Bad) : Cell(file.interface),
                file.problem.empty() ? Cell::list(file.keys) : Cell(file.problem, Style::Bad)});
   }
   write(table.text(session.layout()));

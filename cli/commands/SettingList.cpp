@@ -72,7 +72,7 @@ broker::Instance settingOf(Session& session, const ListSetting& setting, const S
 std::string placeOf(const Session& session, const ListSetting& setting) {
   if (setting.isOfInterface || session.isRemote()) return {};
   const std::string interface = interfaceOfHostSettings(session).value_or("");
-  return placeOfHostSettings(interface, findSettingFiles().has(interface));
+  return placeOfHostSettings(interface, findSettingFiles(zorva::agent::dataDirectory()).has(interface));
 }
 
 /// Replaces the list by the result of `changed`. No other program can change it in the meantime.

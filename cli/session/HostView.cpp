@@ -92,7 +92,7 @@ class Configurations {
     for (const zorva::agent::Node& node : tree.nodes()) {
       const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
       if (node.type() != zorva::agent::NodeType::NetworkIPConfig || name == nullptr) continue;
-      const bool isServiceProcessor = tree.parent(tree.parent(node)).description() == "BMC";
+      const bool isServiceProcessor = tree.systemOf(node).isServiceProcessor();
       byName_.try_emplace({isServiceProcessor, *name}, &node);
     }
   }
@@ -111,7 +111,7 @@ class Configurations {
 class LocalFacts {
  public:
   explicit LocalFacts(const Session& session)
-      : tree_(session.tree()), configurations_(*tree_), files_(findSettingFiles()) {}
+      : tree_(session.tree()), configurations_(*tree_), files_(findSettingFiles(zorva::agent::dataDirectory())) {}
 
   const zorva::agent::TreeSnapshot& tree() const { return *tree_; }
   const zorva::agent::Node* find(const std::string& interface, bool isServiceProcessor) const {
@@ -154,28 +154,18 @@ std::uint64_t secondsNow() {
   return static_cast<std::uint64_t>(std::chrono::duration_cast<std::chrono::seconds>(now).count());
 }
 
-std::string textOf(const zorva::agent::Node& node, zorva::agent::PropertyNumber number) {
-  const std::string* text = node.text(number);
-  return text == nullptr ? std::string() : *text;
-}
-
-std::vector<std::string> listOf(const zorva::agent::Node& node, zorva::agent::PropertyNumber number) {
-  const zorva::agent::StringList* list = node.list(number);
-  return list == nullptr ? std::vector<std::string>() : *list;
-}
-
 OwnerFacts ownerFacts(const zorva::agent::Node& node) {
   using namespace zorva::agent;
-  return {textOf(node, kDnsOwner),
-          textOf(node, kDnsProfile),
-          textOf(node, kDnsOrigin),
-          listOf(node, kDnsServersInFull),
-          listOf(node, kDnsRoutingDomains),
-          textOf(node, kDnsDefaultRoute),
-          textOf(node, kDnsOverTls),
-          textOf(node, kDnssec),
-          textOf(node, kLlmnr),
-          textOf(node, kMulticastDns)};
+  return {node.textOrEmpty(kDnsOwner),
+          node.textOrEmpty(kDnsProfile),
+          node.textOrEmpty(kDnsOrigin),
+          node.listOrEmpty(kDnsServersInFull),
+          node.listOrEmpty(kDnsRoutingDomains),
+          node.textOrEmpty(kDnsDefaultRoute),
+          node.textOrEmpty(kDnsOverTls),
+          node.textOrEmpty(kDnssec),
+          node.textOrEmpty(kLlmnr),
+          node.textOrEmpty(kMulticastDns)};
 }
 
 /// The instances of a class; if they cannot be read, the view says why.
@@ -242,7 +232,7 @@ void placeFacts(InterfaceRow& row, const LocalFacts& local) {
   if (node == nullptr) return;
   row.facts = ownerFacts(*node);
   if (row.source == SettingSource::File) {
-    row.hostServers = listOf(*node, ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES);
+    row.hostServers = node->listOrEmpty(ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES);
     return;
   }
   const auto& properties = node->properties();
@@ -276,12 +266,12 @@ void readSystemNode(const zorva::agent::TreeSnapshot& tree, HostRow& host) {
        node = tree.nextOfType(NodeType::System, node->index() + 1)) {
     if (node->isServiceProcessor()) continue;
     host.facts = ownerFacts(*node);
-    host.servers = listOf(*node, ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES);
-    host.ownSuffixes = listOf(*node, ZV::NodeLexicon::PROP_DNS_SUFFIXES);
-    host.resolverServers = listOf(*node, kResolverServers);
-    host.resolverNotAsked = listOf(*node, kResolverNotAsked);
-    host.resolverSearch = listOf(*node, kResolverSearch);
-    host.resolverOptions = listOf(*node, kResolverOptions);
+    host.servers = node->listOrEmpty(ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES);
+    host.ownSuffixes = node->listOrEmpty(ZV::NodeLexicon::PROP_DNS_SUFFIXES);
+    host.resolverServers = node->listOrEmpty(kResolverServers);
+    host.resolverNotAsked = node->listOrEmpty(kResolverNotAsked);
+    host.resolverSearch = node->listOrEmpty(kResolverSearch);
+    host.resolverOptions = node->listOrEmpty(kResolverOptions);
     return;
   }
 }
@@ -296,7 +286,7 @@ std::optional<BmcReading> readingOfBmc(const zorva::agent::TreeSnapshot& tree) {
     state.readAt = *at;
     state.interval = *interval;
     const std::uint64_t now = secondsNow();
-    return BmcReading{*at, now > *at ? now - *at : 0, state.isUnknownAt(now), textOf(node, kReadProblem)};
+    return BmcReading{*at, now > *at ? now - *at : 0, state.isUnknownAt(now), node.textOrEmpty(kReadProblem)};
   }
   return std::nullopt;
 }
@@ -388,7 +378,7 @@ bool InterfaceRow::hasDns() const {
 }
 
 std::string InterfaceRow::from() const {
-  if (source == SettingSource::File) return "ifcfg-" + name;
+  if (source == SettingSource::File) return zorva::agent::settingFileName(name);
   if (source == SettingSource::Set) return "overlay.json";
   if (source == SettingSource::None && facts.owner.empty()) return {};
   if (facts.owner.empty()) return sourceName(SettingSource::Host);
@@ -401,7 +391,7 @@ std::string InterfaceRow::from() const {
 
 std::string placeOfHostSettings(const std::string& interface, bool hasFile) {
   if (interface.empty()) return {};
-  const std::string file = "ifcfg-" + interface;
+  const std::string file = zorva::agent::settingFileName(interface);
   constexpr const char* kWhy = "the settings of the host are in the file of the first interface";
   if (hasFile) return "kept in " + file + ": " + kWhy;
   return std::string("from the host; ") + file + ", which does not exist, would replace them: " + kWhy;

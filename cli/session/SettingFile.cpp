@@ -11,6 +11,7 @@
 #include <utility>
 
 #include "agent/Agent.h"
+#include "agent/files/SettingFiles.h"
 #include "cli/output/Failure.h"
 #include "cli/output/Text.h"
 #include "util/FileDescriptor.h"
@@ -85,7 +86,8 @@ const char* bootProtocol(const zorva::agent::AddressList& addresses) {
 
 }  // namespace
 
-SettingFile::SettingFile(const std::string& interface) : path_(zorva::agent::dataDirectory() + "ifcfg-" + interface) {
+SettingFile::SettingFile(const std::string& interface)
+    : path_(zorva::agent::dataDirectory() + zorva::agent::settingFileName(interface)) {
   if (interface.empty() || interface.find('/') != std::string::npos || interface.find('\0') != std::string::npos) {
     throw Failure(ExitCode::WrongUsage, "'" + printable(interface) + "' cannot be the name of an interface");
   }

@@ -25,11 +25,12 @@ std::vector<std::string> orphansAmong(const SettingFiles& files, const zorva::ag
 void warnOfOrphans(const Session& session) {
   constexpr std::size_t kShownNames = 5;
   if (session.isRemote()) return;
-  const std::vector<std::string> orphans = orphansAmong(findSettingFiles(), *session.tree());
+  const std::vector<std::string> orphans =
+      orphansAmong(findSettingFiles(zorva::agent::dataDirectory()), *session.tree());
   if (orphans.empty()) return;
   std::vector<std::string> names;
   for (std::size_t i = 0; i < std::min(orphans.size(), kShownNames); ++i) {
-    names.push_back("ifcfg-" + printable(orphans[i]));
+    names.push_back(printable(zorva::agent::settingFileName(orphans[i])));
   }
   const std::string more =
       orphans.size() > names.size() ? " and " + std::to_string(orphans.size() - names.size()) + " more" : "";

@@ -5,14 +5,15 @@
 #include <string>
 #include <vector>
 
+#include "agent/Agent.h"
+#include "agent/files/SettingFiles.h"
 #include "agent/tree/TreeSnapshot.h"
 #include "cli/session/Session.h"
-#include "frontend/SettingFiles.h"
 
 namespace zorva::cli {
 
-using frontend::findSettingFiles;
-using frontend::SettingFiles;
+using zorva::agent::findSettingFiles;
+using zorva::agent::SettingFiles;
 
 /// Those of the interfaces that are not in the tree.
 std::vector<std::string> orphansAmong(const SettingFiles& files, const zorva::agent::TreeSnapshot& tree);
