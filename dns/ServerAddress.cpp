@@ -3,6 +3,7 @@
 #include <arpa/inet.h>
 #include <net/if.h>
 
+#include <algorithm>
 #include <charconv>
 #include <cstring>
 
@@ -52,6 +53,13 @@ std::uint32_t scopeOf(const std::string& zone) {
   return error == std::errc() && end == zone.data() + zone.size() ? number : 0;
 }
 
+std::optional<std::string> addressAlone(const std::string& text) {
+  auto server = parseServer(text);
+  if (!server) return std::nullopt;
+  server->port = kUsualPort;
+  return server->text();
+}
+
 }  // namespace
 
 std::string ServerAddress::text() const {
@@ -98,6 +106,15 @@ std::optional<SocketAddress> socketAddress(const ServerAddress& server) {
   std::memcpy(&made.storage, &address, sizeof address);
   made.size = sizeof address;
   return made;
+}
+
+std::vector<std::string> withPorts(const std::vector<std::string>& servers, const std::vector<std::string>& inFull) {
+  std::vector<std::string> texts = servers;
+  for (std::size_t i = 0; i < std::min(servers.size(), inFull.size()); ++i) {
+    const auto address = addressAlone(inFull[i]);
+    if (address && address == addressAlone(servers[i])) texts[i] = inFull[i];
+  }
+  return texts;
 }
 
 }  // namespace zorva::dns

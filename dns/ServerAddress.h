@@ -9,6 +9,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace zorva::dns {
 
@@ -25,9 +26,12 @@ struct ServerAddress {
 };
 
 /// The address of "192.0.2.1", "192.0.2.1:853#dns.example.org", "2001:db8::1%eth0", "[2001:db8::1]:5353". The name
-/// after
-/// "#" is left out. Nothing for any other text.
+/// after "#" is left out. Nothing for any other text.
 std::optional<ServerAddress> parseServer(std::string_view text);
+
+/// The servers, each as it stands at its place in `inFull` if that is the same address with a port or a name. What was
+/// set instead of the owner's servers is another address, and stays.
+std::vector<std::string> withPorts(const std::vector<std::string>& servers, const std::vector<std::string>& inFull);
 
 /// The same with the zone as the number of an interface of this host. Nothing if it has none of that name.
 struct SocketAddress {

@@ -18,21 +18,13 @@ namespace {
 using agent::Node;
 using agent::StringList;
 
-void addServers(const StringList* servers, std::set<std::string>& seen, std::vector<std::string>& result) {
-  if (servers == nullptr) return;
-  for (const std::string& each : *servers) {
+void addServers(const std::vector<std::string>& servers, std::set<std::string>& seen,
+                std::vector<std::string>& result) {
+  for (const std::string& each : servers) {
     const auto address = dns::parseServer(each);
     if (!address || result.size() >= kMostChecked) continue;
     if (seen.insert(address->text()).second) result.push_back(address->text());
   }
-}
-
-/// With ports where the owner says any.
-const StringList* serversOf(const Node& node) {
-  const StringList* plain = node.list(ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES);
-  const StringList* inFull = node.list(agent::kDnsServersInFull);
-  const bool isSame = plain != nullptr && inFull != nullptr && plain->size() == inFull->size();
-  return isSame ? inFull : plain;
 }
 
 struct Checked {
@@ -66,11 +58,11 @@ std::vector<std::string> serversToAsk(const agent::TreeSnapshot& tree) {
   std::set<std::string> seen;
   for (const Node& node : tree.nodes()) {
     if (node.type() == agent::NodeType::System && !node.isServiceProcessor()) {
-      addServers(node.list(agent::kResolverServers), seen, result);
+      addServers(node.listOrEmpty(agent::kResolverServers), seen, result);
     }
-    if (node.type() != agent::NodeType::NetworkIPConfig || tree.parent(tree.parent(node)).isServiceProcessor())
-      continue;
-    addServers(serversOf(node), seen, result);
+    if (node.type() != agent::NodeType::NetworkIPConfig || tree.systemOf(node).isServiceProcessor()) continue;
+    const StringList& servers = node.listOrEmpty(ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES);
+    addServers(dns::withPorts(servers, node.listOrEmpty(agent::kDnsServersInFull)), seen, result);
   }
   return result;
 }

@@ -65,6 +65,10 @@ TEST(DnsChecks, AskEachServerOfTheHostOnce) {
   EXPECT_EQ(serversToAsk(*treeWith(many)).size(), kMostChecked);
 }
 
+TEST(DnsChecks, AskServersThatWereSetAndNotTheOwners) {
+  EXPECT_THAT(serversToAsk(*treeWith({"192.0.2.77"}, {"192.0.2.1:5353"})), ElementsAre("192.0.2.77"));
+}
+
 TEST(DnsChecks, AskNobodyUntilTheyHaveAnInterval) {
   const DnsChecks checks([]() -> std::shared_ptr<const agent::TreeSnapshot> { throw std::logic_error("asked"); });
   EXPECT_EQ(textOf(checks), "");

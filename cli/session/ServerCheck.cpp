@@ -24,33 +24,16 @@ struct Client {
   std::vector<std::string> suffixes;
 };
 
-std::optional<std::string> addressAlone(const std::string& text) {
-  auto server = dns::parseServer(text);
-  if (!server) return std::nullopt;
-  server->port = dns::kUsualPort;
-  return server->text();
-}
-
-/// The servers with the ports that the owner has for them. What was set since, or is in a file, has none.
-std::vector<std::string> withPorts(const std::vector<std::string>& servers, const std::vector<std::string>& inFull) {
-  std::vector<std::string> texts = servers;
-  for (std::size_t i = 0; i < std::min(servers.size(), inFull.size()); ++i) {
-    const auto address = addressAlone(inFull[i]);
-    if (address && address == addressAlone(servers[i])) texts[i] = inFull[i];
-  }
-  return texts;
-}
-
 std::vector<Client> clientsOf(const HostView& view, bool asksHost) {
   std::vector<Client> clients;
   for (const InterfaceRow& row : view.interfaces) {
-    clients.push_back({row.name, withPorts(row.servers, row.facts.serversInFull), {}, row.suffixes});
+    clients.push_back({row.name, dns::withPorts(row.servers, row.facts.serversInFull), {}, row.suffixes});
   }
   if (!asksHost) return clients;
   const HostRow& host = view.host;
   clients.push_back({"host", host.resolverServers, host.resolverNotAsked, host.resolverSearch});
   if (!host.servers.empty()) {
-    clients.push_back({host.facts.owner, withPorts(host.servers, host.facts.serversInFull), {}, host.ownSuffixes});
+    clients.push_back({host.facts.owner, dns::withPorts(host.servers, host.facts.serversInFull), {}, host.ownSuffixes});
   }
   return clients;
 }
