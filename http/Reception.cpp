@@ -139,7 +139,7 @@ Reception::Result Reception::lookAt(Newcomer& newcomer) {
 Reception::Result Reception::admit(Newcomer& newcomer) {
   const int descriptor = newcomer.socket.get();
   if (newcomer.isWatched) ::epoll_ctl(epoll_.get(), EPOLL_CTL_DEL, descriptor, nullptr);
-  wakeAt(descriptor, 1);
+  if (newcomer.awaited != 0) wakeAt(descriptor, 1);
   admit_(std::move(newcomer));
   return Result::Admitted;
 }
