@@ -68,15 +68,15 @@ def half_handshakes(port, done):
             client.sendall(hello if whole else hello[:1])
             held.append([client, len(hello) if whole else 1])
         done.value += HANDSHAKES if done.value == 0 else 1
-        time.sleep(0.05)
-        for entry in list(held):
+        for entry in [each for each in held if each[1] < len(hello)]:
             client, sent = entry
+            time.sleep(0.05 / HANDSHAKES)  # not all at once: that would be a load of its own on this machine
             try:
-                if sent < len(hello):
-                    client.sendall(hello[sent:sent + 1])
-                    entry[1] = sent + 1
+                client.sendall(hello[sent:sent + 1])
+                entry[1] = sent + 1
             except OSError:
                 held.remove(entry)
+        time.sleep(0.02)
 
 
 def attack_at_lowest_priority(attack, port, done):

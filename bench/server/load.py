@@ -316,7 +316,7 @@ def waits_beside_intruders(build):
                          ("300 half handshakes", intruders.half_handshakes)):
         with secure_server(build) as (_, port, login):
             def wait():
-                return statistics.median(load(port, class_name, 1, 2, "https", login)[2] for _ in range(3))
+                return statistics.median(load(port, class_name, 1, 2, "https", login)[2] for _ in range(5))
 
             quiet = wait()
             with intruders.running(attack, port) as done:
