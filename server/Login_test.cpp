@@ -81,6 +81,21 @@ const std::string kRob = "-u 'rob:battery staple'";
 const auto kMayNot = HasSubstr("<ERROR CODE=\"2\"");
 const auto kIsRead = AllOf(HasSubstr(">eth0<"), EndsWith("200"));
 
+TEST_F(Login, PagesOfTheHostAreForUsersWhoMayReadItsSettings) {
+  writeUsers("rob:" + access::hashPassword("battery staple") +
+             ":read:interop=none\nisa:" + access::hashPassword("red tape") + ":none:interop=read\n");
+  const TestDaemon daemon(config("anonymous = \"none\"\n"));
+  for (const char* page : {"/metrics", "/watch"}) {
+    const auto get = [&](const std::string& options) {
+      return outputOf("curl -sS -m 2 -o /dev/null -w '%{http_code}' --cacert " + authority_.file() + " " + options +
+                      " https://localhost:" + std::to_string(daemon.tlsPort()) + page + " 2>/dev/null; true");
+    };
+    EXPECT_EQ(get(""), "401") << page;
+    EXPECT_EQ(get("-u 'isa:red tape'"), "403") << page;
+    EXPECT_EQ(get(kRob), "200") << page;
+  }
+}
+
 TEST_F(Login, EachUserMayDoWhatTheRoleSays) {
   const TestDaemon daemon(config());
   for (const std::string& user : {kAlice, kRob, std::string()}) EXPECT_THAT(read(daemon, user), kIsRead) << user;
