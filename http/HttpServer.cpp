@@ -160,7 +160,6 @@ class HttpServer::Core {
   std::optional<Refusal> checkWebPage(OpenConnection& connection, const HeaderList& headers);
   std::optional<Refusal> checkRequest(MHD_Connection* connection, HttpExchange& exchange, const char* version);
   std::optional<Refusal> admit(HttpExchange& exchange);
-  void awaitLogin(HttpExchange& exchange, const std::string* authorization);
   MHD_Result loginIsDecided(HttpExchange& exchange, MHD_Connection* connection);
   static std::optional<Refusal> letIn(HttpExchange& exchange, access::Decision decision);
   void readBody(HttpExchange& exchange, std::string_view data);
@@ -466,13 +465,20 @@ std::optional<Refusal> HttpServer::Core::identify(OpenConnection& connection, gn
   return Refusal{403, connection.refusal, {}};
 }
 
-/// Finds out who the client is. Public pages are shown to everybody.
+/// Finds out who the client is. Public pages are shown to everybody. The body is not read before the client is known.
 std::optional<Refusal> HttpServer::Core::admit(HttpExchange& exchange) {
   if (exchange.page != nullptr && exchange.page->isPublic) return std::nullopt;
   const std::string* authorization = findHeader(exchange.request.headers, MHD_HTTP_HEADER_AUTHORIZATION);
   access::Decision decision = gate_->decide(exchange.client->origin(), authorization);
-  if (decision.kind != access::Decision::Kind::MustVerify) return letIn(exchange, std::move(decision));
-  awaitLogin(exchange, authorization);
+  const bool mustVerify = decision.kind == access::Decision::Kind::MustVerify;
+  if (!mustVerify && decision.kind != access::Decision::Kind::TooEarly) return letIn(exchange, std::move(decision));
+  access::Origin origin = exchange.client->origin();
+  exchange.awaitsLogin = true;
+  exchange.client->enter(Phase::Working);
+  exchange.suspend();
+  Applicant applicant{std::move(origin), authorization == nullptr ? std::string() : *authorization,
+                      [held = exchange.shared_from_this()](access::Decision later) { held->decide(std::move(later)); }};
+  mustVerify ? logins_.submit(std::move(applicant)) : logins_.hold(std::move(applicant), std::move(decision));
   return std::nullopt;
 }
 
@@ -483,16 +489,6 @@ std::optional<Refusal> HttpServer::Core::letIn(HttpExchange& exchange, access::D
   auto refusal = refusalOf(decision);
   if (!refusal) exchange.request.who = std::move(decision.client);
   return refusal;
-}
-
-/// The body is not read before the client is known.
-void HttpServer::Core::awaitLogin(HttpExchange& exchange, const std::string* authorization) {
-  exchange.awaitsLogin = true;
-  exchange.client->enter(Phase::Working);
-  exchange.suspend();
-  logins_.submit(
-      {exchange.client->origin(), authorization == nullptr ? std::string() : *authorization,
-       [held = exchange.shared_from_this()](access::Decision decision) { held->decide(std::move(decision)); }});
 }
 
 MHD_Result HttpServer::Core::loginIsDecided(HttpExchange& exchange, MHD_Connection* connection) {

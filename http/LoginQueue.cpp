@@ -45,6 +45,7 @@ class LoginQueue::Core : public std::enable_shared_from_this<Core> {
   explicit Core(std::shared_ptr<access::Gate> gate) : gate_(std::move(gate)) {}
 
   void submit(Applicant applicant);
+  void hold(Applicant applicant, Decision decision);
   void sweep(Clock::time_point now);
   std::size_t count() const;
   void giveUpAll();
@@ -72,6 +73,7 @@ class LoginQueue::Core : public std::enable_shared_from_this<Core> {
   void run();
   void checkNext(std::unique_lock<std::mutex>& lock);
   Decision check(const Applicant& applicant) noexcept;
+  bool holdBack(const Applicant& applicant, const Decision& decision);
   void takeOverdue(Clock::time_point now, Decided& decided);
   void takeHeld(Clock::time_point now, Decided& decided);
 
@@ -181,14 +183,30 @@ void LoginQueue::Core::checkNext(std::unique_lock<std::mutex>& lock) {
   lock.lock();
   if (!checked_) return;
   checked_.reset();
-  if (decision.kind == Decision::Kind::NeedsLogin && decision.delay.count() > 0 && held_.size() < kMostHeld) {
-    const auto until = Clock::now() + decision.delay;
-    held_.push_back({applicant, std::move(decision), until});
-    return;
-  }
+  if (holdBack(applicant, decision)) return;
   lock.unlock();
   applicant.decided(std::move(decision));
   lock.lock();
+}
+
+/// False: it is handed out at once.
+bool LoginQueue::Core::holdBack(const Applicant& applicant, const Decision& decision) {
+  const bool isTooEarly = decision.kind == Decision::Kind::TooEarly;
+  if (!isTooEarly && decision.kind != Decision::Kind::NeedsLogin) return false;
+  const auto sameKind = [&](const Held& each) { return each.decision.kind == decision.kind; };
+  const auto held = static_cast<std::size_t>(std::count_if(held_.begin(), held_.end(), sameKind));
+  if (stopping_ || decision.delay.count() <= 0 || held >= (isTooEarly ? kMostHeldTooEarly : kMostHeld)) return false;
+  const auto delay = isTooEarly ? std::min(decision.delay, kTooEarlyIsHeld) : decision.delay;
+  held_.push_back({applicant, decision, Clock::now() + delay});
+  return true;
+}
+
+void LoginQueue::Core::hold(Applicant applicant, Decision decision) {
+  {
+    const std::lock_guard lock(mutex_);
+    if (holdBack(applicant, decision)) return;
+  }
+  applicant.decided(std::move(decision));
 }
 
 Decision LoginQueue::Core::check(const Applicant& applicant) noexcept try {
@@ -268,6 +286,10 @@ LoginQueue::~LoginQueue() {
 }
 
 void LoginQueue::submit(Applicant applicant) { core_->submit(std::move(applicant)); }
+
+void LoginQueue::hold(Applicant applicant, access::Decision decision) {
+  core_->hold(std::move(applicant), std::move(decision));
+}
 
 void LoginQueue::sweep(Clock::time_point now) { core_->sweep(now); }
 

@@ -4,7 +4,9 @@
 // the requests of clients that are known.
 //
 // The clients take turns, so a client with a thousand wrong logins does not delay another one's first. The answer to a
-// failed login is held back without keeping the thread. The numbers of waiting logins and of held answers are limited.
+// failed login is held back without keeping the thread, and so is that to one that came too early: its client would
+// come again at once, and each new connection costs a handshake. The numbers of waiting logins and of held answers are
+// limited.
 
 #include <chrono>
 #include <cstddef>
@@ -30,6 +32,8 @@ class LoginQueue : util::NotCopied {
   static constexpr std::size_t kMost = 512;
   static constexpr std::size_t kMostOfClient = 128;
   static constexpr std::size_t kMostHeld = 64;
+  static constexpr std::size_t kMostHeldTooEarly = 128;
+  static constexpr std::chrono::milliseconds kTooEarlyIsHeld{1000};
   static constexpr std::chrono::seconds kLongestWait{20};
 
   explicit LoginQueue(std::shared_ptr<access::Gate> gate);
@@ -39,6 +43,9 @@ class LoginQueue : util::NotCopied {
 
   /// Takes an applicant; without room, it is decided at once that it must come again.
   void submit(Applicant applicant);
+
+  /// Gives a decision that needs no check, which is Kind::TooEarly: after a while, or at once without room.
+  void hold(Applicant applicant, access::Decision decision);
 
   /// Sends the answers whose delay is over, and gives up the logins that have waited for too long.
   void sweep(std::chrono::steady_clock::time_point now = std::chrono::steady_clock::now());

@@ -60,14 +60,22 @@ class LoginQueueTest : public ::testing::Test {
   ~LoginQueueTest() override { gate_->open(); }
 
   void submit(const std::string& address, const std::string& authorization = "right") {
-    Applicant applicant{{}, authorization, [this](const Decision& decision) {
-                          const std::lock_guard lock(mutex_);
-                          decisions_.push_back(decision.kind);
-                          changed_.notify_all();
-                        }};
-    applicant.origin.way = access::Origin::Way::Network;
-    applicant.origin.address = address;
-    queue_.submit(std::move(applicant));
+    queue_.submit(applicant(address, authorization));
+  }
+
+  void hold(milliseconds delay) {
+    queue_.hold(applicant("192.0.2.1", "early"), {Kind::TooEarly, nullptr, "early", delay});
+  }
+
+  Applicant applicant(const std::string& address, const std::string& authorization) {
+    Applicant made{{}, authorization, [this](const Decision& decision) {
+                     const std::lock_guard lock(mutex_);
+                     decisions_.push_back(decision.kind);
+                     changed_.notify_all();
+                   }};
+    made.origin.way = access::Origin::Way::Network;
+    made.origin.address = address;
+    return made;
   }
 
   std::vector<Kind> decisions(std::size_t least) {
@@ -175,7 +183,30 @@ TEST_F(LoginQueueTest, AGateThatFailsLeavesTheThread) {
   gate_->open();
   submit("192.0.2.1", "throws");
   submit("192.0.2.1");
-  EXPECT_THAT(decisions(2), ElementsAre(Kind::TooEarly, Kind::Admitted));
+  EXPECT_THAT(decisions(1), ElementsAre(Kind::Admitted));
+  queue_.sweep(Clock::now() + LoginQueue::kTooEarlyIsHeld);
+  EXPECT_THAT(decisions(2), ElementsAre(Kind::Admitted, Kind::TooEarly));
+}
+
+TEST_F(LoginQueueTest, WhoComesTooEarlyLearnsItAfterAWhileSoThatFewConnectionsAreMade) {
+  for (std::size_t i = 0; i < LoginQueue::kMostHeldTooEarly; ++i) hold(seconds(8));
+  EXPECT_THAT(decisions(0), ElementsAre());
+  hold(seconds(8));
+  EXPECT_THAT(decisions(1), ElementsAre(Kind::TooEarly)) << "there is no room for more";
+  queue_.sweep(Clock::now() + LoginQueue::kTooEarlyIsHeld / 2);
+  EXPECT_EQ(decisions(0).size(), 1U);
+  queue_.sweep(Clock::now() + LoginQueue::kTooEarlyIsHeld);
+  EXPECT_EQ(decisions(0).size(), 1U + LoginQueue::kMostHeldTooEarly);
+  EXPECT_EQ(queue_.count(), 0U);
+  queue_.giveUpAll();
+  hold(seconds(8));
+  EXPECT_EQ(decisions(0).size(), 2U + LoginQueue::kMostHeldTooEarly);
+}
+
+TEST_F(LoginQueueTest, WhoMayComeAgainSoonIsNotHeldForLonger) {
+  hold(milliseconds(100));
+  queue_.sweep(Clock::now() + milliseconds(100));
+  EXPECT_THAT(decisions(0), ElementsAre(Kind::TooEarly));
 }
 
 }  // namespace

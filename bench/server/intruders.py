@@ -28,7 +28,7 @@ def trusting():
 
 
 def wrong_logins(port, done):
-    """Tries a thousand passwords and more, on 20 connections at once, which the server may close."""
+    """Tries one password after the other, on 20 connections at once, which the server may close."""
     context = trusting()
 
     def guess():

@@ -312,7 +312,7 @@ def tls(build):
 def waits_beside_intruders(build):
     figures = []
     class_name = "ZORVA_DNSProtocolEndPoint"
-    for name, attack in (("1,000 wrong logins", intruders.wrong_logins),
+    for name, attack in (("wrong logins on 20 connections", intruders.wrong_logins),
                          ("300 half handshakes", intruders.half_handshakes)):
         with secure_server(build) as (_, port, login):
             def wait():
