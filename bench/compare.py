@@ -58,7 +58,7 @@ ASSOCIATIONS = {
 }
 
 PROVIDERS = [
-    Figure("an endpoint of 1,000, to one by a program that only makes the calls of CMPI", 4.5, "providers_bench",
+    Figure("an endpoint of 1,000, to one by a program that only makes the calls of CMPI", 6, "providers_bench",
            "Endpoints/1000", "StraightEndpoints/1000"),
     Figure("an endpoint of 10,000, to one of 100", 1.5, "providers_bench", "Endpoints/10000", "Endpoints/100", 10000, 100),
     Figure("an endpoint of 1,000, to one of 100", 1.5, "providers_bench", "Endpoints/1000", "Endpoints/100", 1000, 100),
