@@ -14,6 +14,7 @@
 #include <string>
 #include <vector>
 
+#include "agent/testing/Program.h"
 #include "agent/testing/TemporaryDirectory.h"
 #include "util/NotCopied.h"
 
@@ -40,16 +41,9 @@ constexpr const char* kFile =
 std::string outputOf(const std::vector<std::string>& words, int& exitCode) {
   std::array<int, 2> ends{};
   EXPECT_EQ(pipe2(ends.data(), O_CLOEXEC), 0);
+  const zorva::agent::testing::Program program(words);
   const pid_t child = fork();
-  if (child == 0) {
-    dup2(ends[1], STDOUT_FILENO);
-    dup2(ends[1], STDERR_FILENO);
-    std::vector<char*> arguments;
-    for (const std::string& word : words) arguments.push_back(const_cast<char*>(word.c_str()));
-    arguments.push_back(nullptr);
-    execvp(arguments[0], arguments.data());
-    _exit(127);
-  }
+  if (child == 0) program.exec(ends[1], ends[1]);
   close(ends[1]);
   std::string output;
   char piece[4096];

@@ -21,7 +21,9 @@
 #include <thread>
 
 #include "agent/testing/NetworkNamespace.h"
+#include "agent/testing/Program.h"
 #include "agent/testing/TemporaryDirectory.h"
+#include "util/FileDescriptor.h"
 
 namespace zorva::agent::testing {
 namespace {
@@ -152,18 +154,6 @@ const Daemon& daemonOf(const std::string& name) {
 
 std::string logOf(const std::string& name) { return "/run/log/" + name; }
 
-[[noreturn]] void execDaemon(const Daemon& daemon) {
-  const int log = ::open(logOf(daemon.name).c_str(), O_WRONLY | O_CREAT | O_APPEND, 0644);
-  ::dup2(log, STDOUT_FILENO);
-  ::dup2(log, STDERR_FILENO);
-  std::vector<char*> arguments;
-  for (const char* word : daemon.command) arguments.push_back(const_cast<char*>(word));
-  arguments.push_back(nullptr);
-  ::execv(arguments.front(), arguments.data());
-  std::perror(arguments.front());
-  ::_exit(127);
-}
-
 }  // namespace
 
 bool canMakePrivateHosts() {
@@ -211,9 +201,11 @@ Daemons::~Daemons() {
 void Daemons::start(const std::string& name) {
   const Daemon& daemon = daemonOf(name);
   if (name == "dbus-daemon") fs::remove(kBusSocket);
+  const Program program({daemon.command.begin(), daemon.command.end()});
+  const util::FileDescriptor log(::open(logOf(name).c_str(), O_WRONLY | O_CREAT | O_APPEND | O_CLOEXEC, 0644));
   const pid_t process = ::fork();
   check(process >= 0, name);
-  if (process == 0) execDaemon(daemon);
+  if (process == 0) program.exec(log.get(), log.get());
   processes_[name] = process;
   constexpr int kTurns = 500;
   for (int turn = 0; turn < kTurns; ++turn) {

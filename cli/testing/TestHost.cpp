@@ -17,11 +17,14 @@
 #include <filesystem>
 #include <stdexcept>
 
+#include "agent/testing/Program.h"
 #include "cli/output/Text.h"
 
 namespace zorva::cli {
 
 namespace {
+
+using agent::testing::Program;
 
 struct Pair {
   int reader;
@@ -79,22 +82,16 @@ int exitCodeOf(pid_t child) {
   return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
 }
 
-[[noreturn]] void become(const std::vector<std::string>& words, int out, int err) {
-  ::dup2(out, STDOUT_FILENO);
-  ::dup2(err, STDERR_FILENO);
-  std::vector<char*> arguments;
-  std::string program = ZORVA_BIN_DIR "/zorvactl";
-  arguments.push_back(program.data());
-  std::vector<std::string> copies = words;
-  for (std::string& word : copies) arguments.push_back(word.data());
-  arguments.push_back(nullptr);
-  ::execv(arguments[0], arguments.data());
-  ::_exit(127);
+std::vector<std::string> zorvactlWith(const std::vector<std::string>& words) {
+  std::vector<std::string> all{ZORVA_BIN_DIR "/zorvactl"};
+  all.insert(all.end(), words.begin(), words.end());
+  return all;
 }
 
 }  // namespace
 
 TestHost::TestHost(const std::vector<std::string>& interfaces) {
+  ::unsetenv("NO_COLOR");
   directory_.write("agent.toml", "[agent]\ndata_dir = \"data\"\n[tree]\nsource = \"file\"\nfile = \"tree.json\"\n");
   std::filesystem::create_directory(directory_ / "data");
   writeTree(R"({"system_name": "host1", "nodes": [{"type": "System", "name": "system", "description": "Computer",)"
@@ -186,14 +183,11 @@ Outcome TestHost::runWithInput(const std::string& input, const std::vector<std::
 
 Outcome TestHost::runAtTerminal(const std::vector<std::string>& words, const std::vector<std::string>& questions,
                                 const std::vector<std::string>& answers) const {
+  const Program zorvactl(zorvactlWith(words), {{"ZORVAGENT_CONFIG", directory_ / "agent.toml"}, {"TERM", "dumb"}});
   int master = -1;
   const pid_t child = ::forkpty(&master, nullptr, nullptr, nullptr);
   if (child < 0) throw std::runtime_error("no terminal");
-  if (child == 0) {
-    ::setenv("ZORVAGENT_CONFIG", (directory_ / "agent.toml").c_str(), 1);
-    ::setenv("TERM", "dumb", 1);
-    become(words, STDOUT_FILENO, STDERR_FILENO);
-  }
+  if (child == 0) zorvactl.exec(STDOUT_FILENO, STDERR_FILENO);
   Outcome outcome;
   std::size_t next = 0;
   char buffer[256];
@@ -210,18 +204,18 @@ Outcome TestHost::runAtTerminal(const std::vector<std::string>& words, const std
 
 Outcome TestHost::runPrepared(const std::function<bool()>& prepare, const Environment& environment,
                               const std::vector<std::string>& words, OutputTo output) const {
+  Environment variables = environment;
+  variables.emplace_back("ZORVAGENT_CONFIG", directory_ / "agent.toml");
+  variables.emplace_back("TERM", "xterm");
+  const Program zorvactl(zorvactlWith(words), variables);
   const Pair out = makeOutput(output);
   const Pair err = output == OutputTo::ErrorTerminal ? makeTerminal() : makePipe();
   const pid_t child = ::fork();
   if (child < 0) throw std::runtime_error("no process");
   if (child == 0) {
-    ::setenv("ZORVAGENT_CONFIG", (directory_ / "agent.toml").c_str(), 1);
-    ::setenv("TERM", "xterm", 1);
-    ::unsetenv("NO_COLOR");
-    for (const auto& [name, value] : environment) ::setenv(name.c_str(), value.c_str(), 1);
     ::dup2(::open("/dev/null", O_RDONLY), STDIN_FILENO);
     if (!prepare()) ::_exit(127);
-    become(words, out.writer, err.writer);
+    zorvactl.exec(out.writer, err.writer);
   }
   ::close(out.writer);
   ::close(err.writer);

@@ -11,6 +11,7 @@
 #include <stdexcept>
 #include <thread>
 
+#include "agent/testing/Program.h"
 #include "http/testing/TestWire.h"
 
 namespace zorva::server::testing {
@@ -19,6 +20,7 @@ namespace {
 
 using Clock = std::chrono::steady_clock;
 using zorva::agent::testing::contentsOf;
+using zorva::agent::testing::Program;
 
 constexpr const char* kTree = R"({"system_name":"host1","nodes":[
   {"type":"System","name":"system","description":"Computer","children":[
@@ -27,16 +29,10 @@ constexpr const char* kTree = R"({"system_name":"host1","nodes":[
         "name":"eth0","host_name":"host1","domain_name":"example.org","dns_suffixes":["example.org"],
         "dns_server_addresses":["192.0.2.53"],"protocol_if_type":4097,"enabled_state":1}}]}]}]})";
 
-/// Replaces this process by the program; the descriptors become its output.
-[[noreturn]] void become(const std::vector<std::string>& arguments, int out, int err) {
-  ::dup2(out, STDOUT_FILENO);
-  ::dup2(err, STDERR_FILENO);
-  static const std::string program = std::string(ZORVA_BIN_DIR) + "/zorvacimd";
-  std::vector<char*> pointers{const_cast<char*>(program.c_str())};
-  for (const std::string& each : arguments) pointers.push_back(const_cast<char*>(each.c_str()));
-  pointers.push_back(nullptr);
-  ::execv(program.c_str(), pointers.data());
-  ::_exit(127);
+std::vector<std::string> zorvacimdWith(const std::vector<std::string>& arguments) {
+  std::vector<std::string> all{ZORVA_BIN_DIR "/zorvacimd"};
+  all.insert(all.end(), arguments.begin(), arguments.end());
+  return all;
 }
 
 int exitCodeOf(int status) { return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status); }
@@ -81,10 +77,11 @@ TestDaemon::TestDaemon(const std::string& config, std::vector<std::string> argum
   util::FileDescriptor out(ends[1]);
   const util::FileDescriptor err(
       ::open((directory_ / "stderr").c_str(), O_WRONLY | O_CREAT | O_APPEND | O_CLOEXEC, 0600));
+  const Program zorvacimd(zorvacimdWith(arguments));
   process_ = ::fork();
   if (process_ == 0) {
     if (prepare) prepare();
-    become(arguments, out.get(), err.get());
+    zorvacimd.exec(out.get(), err.get());
   }
   out = util::FileDescriptor();
 
@@ -139,8 +136,9 @@ DaemonOutcome TestDaemon::run(const std::vector<std::string>& arguments) {
   const zorva::agent::testing::TemporaryDirectory directory;
   const util::FileDescriptor out(::open((directory / "out").c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600));
   const util::FileDescriptor err(::open((directory / "err").c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600));
+  const Program zorvacimd(zorvacimdWith(arguments));
   const pid_t process = ::fork();
-  if (process == 0) become(arguments, out.get(), err.get());
+  if (process == 0) zorvacimd.exec(out.get(), err.get());
   int status = 0;
   ::waitpid(process, &status, 0);
   return {exitCodeOf(status), contentsOf(directory / "out"), contentsOf(directory / "err")};
