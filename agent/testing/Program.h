@@ -18,12 +18,13 @@ class Program : util::NotCopied {
  public:
   using Environment = std::vector<std::pair<std::string, std::string>>;
 
-  /// The first word is the program: a path, or a name that is looked up in PATH. The environment is this process's, and
-  /// these variables.
+  /// The first word is the program: a path, or a name that is looked up in PATH. With variables, its environment is
+  /// what this process has now, and these; without, it is what the child has when it calls exec().
   explicit Program(std::vector<std::string> words, const Environment& environment = {}) : words_(std::move(words)) {
-    for (const auto& [name, value] : environment) variables_.push_back(name + "=" + value);
     for (std::string& word : words_) arguments_.push_back(word.data());
     arguments_.push_back(nullptr);
+    if (environment.empty()) return;
+    for (const auto& [name, value] : environment) variables_.push_back(name + "=" + value);
     for (std::string& variable : variables_) environment_.push_back(variable.data());
     for (char** each = ::environ; *each != nullptr; ++each) {
       if (!isReplaced(*each)) environment_.push_back(*each);
@@ -35,7 +36,7 @@ class Program : util::NotCopied {
   [[noreturn]] void exec(int out, int err) const {
     ::dup2(out, STDOUT_FILENO);
     ::dup2(err, STDERR_FILENO);
-    ::execvpe(arguments_.front(), arguments_.data(), environment_.data());
+    ::execvpe(arguments_.front(), arguments_.data(), environment_.empty() ? ::environ : environment_.data());
     ::_exit(127);
   }
 

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <atomic>
 #include <chrono>
+#include <filesystem>
 #include <future>
 #include <thread>
 
@@ -14,12 +15,15 @@ namespace {
 
 using testing::ContainsRegex;
 
-/// Runs it while the domain of an interface is set to one value after another.
+/// Runs it while the domain of an interface is set to one value after another. The file is replaced as a whole: while
+/// it was written in place, a watcher would see the value go.
 Outcome runWhileChanging(const TestHost& host, const Words& words, const std::string& interface = "eth0") {
   auto outcome = std::async(std::launch::async, [&] { return host.run(words); });
   for (int i = 0; outcome.wait_for(std::chrono::milliseconds(100)) != std::future_status::ready; ++i) {
-    host.directory().write("data/overlay.json", R"({"/system/)" + interface + R"(/ip": {"domain_name": "d)" +
-                                                    std::to_string(i) + ".example\"}}");
+    const std::string written =
+        host.directory().write("overlay.new", R"({"/system/)" + interface + R"(/ip": {"domain_name": "d)" +
+                                                  std::to_string(i) + ".example\"}}");
+    std::filesystem::rename(written, host.dataFile("overlay.json"));
     if (i > 300) break;  // it hangs, and the test's time limit ends it
   }
   return outcome.get();
