@@ -2,13 +2,14 @@
 
 #include <cstdio>
 
+#include "cli/commands/CheckText.h"
 #include "cli/commands/Commands.h"
 #include "cli/commands/ViewJson.h"
 #include "cli/output/Console.h"
 #include "cli/output/Text.h"
 #include "cli/session/HostView.h"
-#include "cli/session/ServerCheck.h"
 #include "cli/session/Session.h"
+#include "dns/ServerCheck.h"
 
 namespace zorva::cli {
 
@@ -28,22 +29,36 @@ dns::Question questionOf(const CheckOptions& options) {
   return {options.name, dns::Type::A};
 }
 
-std::string timeText(const CheckedServer& server) {
+std::string timeText(const dns::CheckedServer& server) {
   if (server.answer.kind != dns::Answer::Kind::Response) return "-";
   char text[32];
   std::snprintf(text, sizeof text, "%.1f ms", static_cast<double>(server.answer.time.count()) / 1000);
   return text;
 }
 
-const char* resolvesText(const CheckedSuffix& suffix) {
+const char* resolvesText(const dns::CheckedSuffix& suffix) {
   if (!suffix.resolves) return "not known";
   return *suffix.resolves ? "resolves" : "does not resolve";
 }
 
-void writeResult(const CheckResult& result, const Layout& layout) {
+std::vector<dns::Asker> askersOf(const HostView& view, bool asksHost) {
+  std::vector<dns::Asker> askers;
+  for (const InterfaceRow& row : view.interfaces) {
+    askers.push_back({row.name, dns::withPorts(row.servers, row.facts.serversInFull), {}, row.suffixes});
+  }
+  if (!asksHost) return askers;
+  const HostRow& host = view.host;
+  askers.push_back({"host", host.resolverServers, host.resolverNotAsked, host.resolverSearch});
+  if (!host.servers.empty()) {
+    askers.push_back({host.facts.owner, dns::withPorts(host.servers, host.facts.serversInFull), {}, host.ownSuffixes});
+  }
+  return askers;
+}
+
+void writeResult(const dns::CheckResult& result, const Layout& layout) {
   Table servers({"SERVER", "TIME", "ANSWER", "USED BY"});
   servers.keepRowsOnOneLine({{3, 12}, {2, 20}, {0, 15}});
-  for (const CheckedServer& server : result.servers) {
+  for (const dns::CheckedServer& server : result.servers) {
     servers.add({server.server, timeText(server), Cell(server.answerText(), server.isGood() ? Style::Good : Style::Bad),
                  Cell::list(server.usedBy)});
   }
@@ -51,26 +66,26 @@ void writeResult(const CheckResult& result, const Layout& layout) {
   if (!result.suffixes.empty()) {
     Table suffixes({"SUFFIX", "ANSWER", "USED BY"});
     suffixes.keepRowsOnOneLine({{2, 12}, {0, 20}});
-    for (const CheckedSuffix& suffix : result.suffixes) {
+    for (const dns::CheckedSuffix& suffix : result.suffixes) {
       const Style style = suffix.resolves ? (*suffix.resolves ? Style::Good : Style::Bad) : Style::Warning;
       suffixes.add({suffix.suffix, Cell(resolvesText(suffix), style), Cell::list(suffix.usedBy)});
     }
     write("\n" + suffixes.text(layout));
   }
   if (!result.problems.empty()) write("\n");
-  for (const std::string& problem : result.problems) {
-    for (const std::string& line : wrapped(problem, layout.width)) write(line + "\n");
+  for (const dns::CheckProblem& problem : result.problems) {
+    for (const std::string& line : wrapped(checkProblemText(problem), layout.width)) write(line + "\n");
   }
 }
 
-CheckResult resultOf(Session& session, const CheckOptions& options) {
+dns::CheckResult resultOf(Session& session, const CheckOptions& options) {
   const dns::Question question = questionOf(options);
   Progress progress;
   HostView view = readHostView(session, progress);
   for (const Problem& problem : view.problems) throw Failure(ExitCode::Failed, problemText(problem));
   if (!options.interfaces.empty()) keepOnly(view, options.interfaces);
   progress.step("asking the servers");
-  return checkServers(view, options.interfaces.empty(), question);
+  return dns::checkServers(askersOf(view, options.interfaces.empty()), view.host.resolverServers, question);
 }
 
 void checkHost(const Globals& globals, const CheckOptions& options) {
@@ -80,7 +95,7 @@ void checkHost(const Globals& globals, const CheckOptions& options) {
                   "leave out --url, and run it on the host that is meant");
   }
   Session session(globals);
-  const CheckResult result = resultOf(session, options);
+  const dns::CheckResult result = resultOf(session, options);
   if (globals.output == OutputFormat::Json) {
     write(checkJson(result) + "\n");
   } else if (!result.servers.empty()) {
@@ -88,8 +103,8 @@ void checkHost(const Globals& globals, const CheckOptions& options) {
   }
   if (result.servers.empty()) throw Failure(ExitCode::Failed, "there is no DNS server to ask");
   if (!result.problems.empty()) {
-    throw Failure(ExitCode::Failed,
-                  counted(result.problems.size(), "problem") + ", the first: " + result.problems.front());
+    throw Failure(ExitCode::Failed, counted(result.problems.size(), "problem") +
+                                        ", the first: " + checkProblemText(result.problems.front()));
   }
 }
 

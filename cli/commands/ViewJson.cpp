@@ -1,6 +1,7 @@
 #include "cli/commands/ViewJson.h"
 
 #include "broker/objects/PathText.h"
+#include "cli/commands/CheckText.h"
 #include "cli/output/JsonDocument.h"
 #include "cli/output/Text.h"
 
@@ -134,7 +135,7 @@ const char* outcomeWord(dns::Answer::Kind kind) noexcept {
   return "no answer";
 }
 
-Json ofCheckedServer(const CheckedServer& server) {
+Json ofCheckedServer(const dns::CheckedServer& server) {
   const bool isResponse = server.answer.kind == dns::Answer::Kind::Response;
   Json entry;
   entry["server"] = asUtf8(server.server);
@@ -149,18 +150,20 @@ Json ofCheckedServer(const CheckedServer& server) {
 
 }  // namespace
 
-std::string checkJson(const CheckResult& result) {
+std::string checkJson(const dns::CheckResult& result) {
   Json json;
+  std::vector<std::string> problems;
   json["question"] = Json{{"name", result.question.name}, {"type", dns::typeName(result.question.type)}};
   json["servers"] = ofRows(result.servers, ofCheckedServer);
-  json["suffixes"] = ofRows(result.suffixes, [](const CheckedSuffix& suffix) {
+  json["suffixes"] = ofRows(result.suffixes, [](const dns::CheckedSuffix& suffix) {
     Json entry;
     entry["suffix"] = asUtf8(suffix.suffix);
     entry["used_by"] = jsonOfTexts(suffix.usedBy);
     entry["resolves"] = suffix.resolves ? Json(*suffix.resolves) : Json(nullptr);
     return entry;
   });
-  json["problems"] = jsonOfTexts(result.problems);
+  for (const dns::CheckProblem& problem : result.problems) problems.push_back(checkProblemText(problem));
+  json["problems"] = jsonOfTexts(problems);
   return documentText(json);
 }
 

@@ -11,9 +11,9 @@
 #include "cli/output/TreeText.h"
 #include "cli/session/ClassRows.h"
 #include "cli/session/HostView.h"
-#include "cli/session/ServerCheck.h"
 #include "cli/session/SettingFile.h"
 #include "cli/session/SettingFiles.h"
+#include "dns/ServerCheck.h"
 
 namespace zorva::cli {
 
@@ -42,7 +42,7 @@ std::string applyResultsJson(const std::vector<zorva::agent::ApplyResult>& resul
 std::string graphJson(const Graph& graph);
 
 /// The result of `check`: "question", "servers", "suffixes", "problems".
-std::string checkJson(const CheckResult& result);
+std::string checkJson(const dns::CheckResult& result);
 
 /// The users of the server: "name", "role", "namespaces" with the role in each, "has_password", "fingerprints" and
 /// "subject".
