@@ -8,7 +8,11 @@ const en = {
   asks: "{owner} asks", none: "none", unknown: "not known", change: "Change", changeSuffixes: "Change the suffixes",
   suffixesFromHost: "The suffixes are from the host. The file {file}, which does not exist, would replace them.",
   suffixesFromFile: "The suffixes are kept in {file}: the settings of the host are in the file of the first interface.",
-  findings: "What stands out", noFindings: "Nothing.", findingsLimit: "Whether the servers answer is not asked here: on the host, zorvactl check asks them.",
+  findings: "What stands out", noFindings: "Nothing.",
+  checks: "What the servers answer", asking: "The servers are being asked …", server: "Server", time: "Time", answer: "Answer", usedBy: "Used by",
+  suffix: "Suffix", resolves: "resolves", doesNotResolve: "does not resolve", noServerToAsk: "There is no DNS server to ask.",
+  notAskedNow: "The servers could not be asked: {why}",
+  checksHint: "The host has just asked each server for the root, and the first three of each list about the suffixes. Refresh asks again.",
   twice_finding: "{who} has {what} twice; it is never asked a second time in its turn.",
   notAsked_finding: "{what} is never asked: /etc/resolv.conf has it after the first three servers.",
   notAddress_finding: "{who} has {what}, which is no address of a server.",
@@ -58,7 +62,11 @@ const de = {
   asks: "{owner} fragt", none: "keine", unknown: "nicht bekannt", change: "Ändern", changeSuffixes: "Suffixe ändern",
   suffixesFromHost: "Die Suffixe sind die des Rechners. Die Datei {file}, die es nicht gibt, würde sie ersetzen.",
   suffixesFromFile: "Die Suffixe stehen in {file}: Die Einstellungen des Rechners sind in der Datei der ersten Schnittstelle.",
-  findings: "Was auffällt", noFindings: "Nichts.", findingsLimit: "Ob die Server antworten, wird hier nicht gefragt: Auf dem Rechner fragt sie zorvactl check.",
+  findings: "Was auffällt", noFindings: "Nichts.",
+  checks: "Was die Server antworten", asking: "Die Server werden gefragt …", server: "Server", time: "Zeit", answer: "Antwort", usedBy: "Genutzt von",
+  suffix: "Suffix", resolves: "wird aufgelöst", doesNotResolve: "wird nicht aufgelöst", noServerToAsk: "Es gibt keinen DNS-Server, der gefragt werden könnte.",
+  notAskedNow: "Die Server konnten nicht gefragt werden: {why}",
+  checksHint: "Der Rechner hat eben jeden Server nach der Wurzel gefragt und die ersten drei jeder Liste nach den Suffixen. „Neu lesen“ fragt wieder.",
   twice_finding: "{who} hat {what} zweimal; der Server wird kein zweites Mal gefragt.",
   notAsked_finding: "{what} wird nie gefragt: Die Adresse steht in /etc/resolv.conf nach den ersten drei Servern.",
   notAddress_finding: "{who} hat {what}; das ist keine Adresse eines Servers.",
@@ -127,6 +135,8 @@ export const word = (value) => words[language][value] ?? String(value ?? "");
 
 export const timeText = (date) => new Intl.DateTimeFormat(language, { timeStyle: "medium" }).format(date);
 export const countText = (count) => new Intl.NumberFormat(language).format(count);
+export const numberText = (number, digits) =>
+  new Intl.NumberFormat(language, { minimumFractionDigits: digits, maximumFractionDigits: digits }).format(number);
 
 /** For tests: the names that one language lacks. */
 export const lacking = () => Object.keys({ ...en, ...de }).filter((name) => !(name in en) || !(name in de));

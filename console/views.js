@@ -1,6 +1,7 @@
 // The views of the host and of one interface.
 
 import { ChangeDialog } from "./change.js";
+import { checksCard } from "./checks.js";
 import { field, h } from "./dom.js";
 import { linkTo } from "./graph.js";
 import { findingsOf, sourceOf } from "./model.js";
@@ -53,8 +54,7 @@ function findingsCard(host) {
   const item = (finding) => h("li", {}, t(`${finding.kind}_finding`, finding));
   return h("section", { class: "card" }, h("h2", {}, t("findings")),
     findings.length === 0 ? h("p", {}, t("noFindings")) : h("ul", { class: "findings" }, findings.slice(0, MOST_FINDINGS).map(item)),
-    findings.length > MOST_FINDINGS && h("p", {}, t("moreFindings", { count: countText(findings.length - MOST_FINDINGS) })),
-    h("p", { class: "hint" }, t("findingsLimit")));
+    findings.length > MOST_FINDINGS && h("p", {}, t("moreFindings", { count: countText(findings.length - MOST_FINDINGS) })));
 }
 
 const cut = (texts, separator = " ") => {
@@ -87,7 +87,7 @@ export function overview(app) {
   };
   input.addEventListener("input", filter);
   filter();
-  const element = h("div", {}, h("div", { class: "cards" }, hostCard(app, host), findingsCard(host)),
+  const element = h("div", {}, h("div", { class: "cards" }, hostCard(app, host), h("div", { class: "stack" }, findingsCard(host), checksCard(app, host))),
     h("section", { class: "card interfaces" }, h("div", { class: "bar" }, h("h2", {}, t("interfaces")), count, field(t("filter"), input)), table.element));
   return { title: t("of", { host: host.name }), element, start: () => table.start(), stop: () => table.stop() };
 }

@@ -17,6 +17,8 @@ struct Asker {
   std::vector<std::string> servers;   ///< with their ports where they have other than the usual one
   std::vector<std::string> notAsked;  ///< servers after those that it asks
   std::vector<std::string> suffixes;
+
+  bool operator==(const Asker&) const = default;
 };
 
 struct CheckedServer {

@@ -9,8 +9,8 @@
 
 namespace zorva::host {
 
-using PropertyValue =
-    std::variant<std::string, std::uint8_t, std::uint16_t, std::vector<std::string>, std::vector<std::uint16_t>>;
+using PropertyValue = std::variant<std::string, std::uint8_t, std::uint16_t, std::uint64_t, bool,
+                                   std::vector<std::string>, std::vector<std::uint16_t>>;
 
 struct HostProperty {
   const char* name;

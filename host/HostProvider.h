@@ -11,7 +11,7 @@
 namespace zorva::host {
 
 /// One provider: its objects, with its own broker and table.
-template <Publish publish>
+template <std::vector<HostObject> (*publish)(const agent::TreeSnapshot&)>
 struct Provider {
   static inline const CMPIBroker* broker = nullptr;
 

@@ -40,6 +40,8 @@ class PropertySetter {
   CMPIStatus set(const char* name, const std::string& text) { return setText(instance_, name, text); }
   CMPIStatus set(const char* name, std::uint8_t number) { return setUint8(instance_, name, number); }
   CMPIStatus set(const char* name, std::uint16_t number) { return setUint16(instance_, name, number); }
+  CMPIStatus set(const char* name, std::uint64_t number) { return setUint64(instance_, name, number); }
+  CMPIStatus set(const char* name, bool value) { return setBoolean(instance_, name, value); }
   CMPIStatus set(const char* name, const std::vector<std::string>& texts) {
     return setElements(name, texts, CMPI_string, [&](CMPIArray* array, CMPICount i) {
       setTextElement(array, i, newString(broker_, texts[i], nullptr));
@@ -111,7 +113,8 @@ bool hasKeysOf(const HostObject& object, const CMPIObjectPath* ref) {
 
 // Calls the function with each object of one class, until it returns a failure or says to stop.
 template <typename Handle>
-CMPIStatus forEachObject(const CMPIBroker* broker, Publish publish, const std::string& className, Handle handle) try {
+CMPIStatus forEachObject(const CMPIBroker* broker, const Publish& publish, const std::string& className,
+                         Handle handle) try {
   for (const HostObject& object : publish(*zorva::agent::currentTree())) {
     if (strcasecmp(object.className, className.c_str()) != 0) continue;
     const CMPIStatus status = handle(object);
@@ -124,7 +127,7 @@ CMPIStatus forEachObject(const CMPIBroker* broker, Publish publish, const std::s
 
 }  // namespace
 
-CMPIStatus enumerateInstanceNames(const CMPIBroker* broker, Publish publish, const CMPIResult* result,
+CMPIStatus enumerateInstanceNames(const CMPIBroker* broker, const Publish& publish, const CMPIResult* result,
                                   const CMPIObjectPath* ref) {
   const std::string nameSpace = nameSpaceOf(ref, nullptr);
   const CMPIStatus status = forEachObject(broker, publish, classNameOf(ref, nullptr), [&](const HostObject& object) {
@@ -137,7 +140,7 @@ CMPIStatus enumerateInstanceNames(const CMPIBroker* broker, Publish publish, con
   return status;
 }
 
-CMPIStatus enumerateInstances(const CMPIBroker* broker, Publish publish, const CMPIResult* result,
+CMPIStatus enumerateInstances(const CMPIBroker* broker, const Publish& publish, const CMPIResult* result,
                               const CMPIObjectPath* ref, const char** properties) {
   const std::string nameSpace = nameSpaceOf(ref, nullptr);
   const CMPIStatus status = forEachObject(broker, publish, classNameOf(ref, nullptr), [&](const HostObject& object) {
@@ -147,8 +150,8 @@ CMPIStatus enumerateInstances(const CMPIBroker* broker, Publish publish, const C
   return status;
 }
 
-CMPIStatus getInstance(const CMPIBroker* broker, Publish publish, const CMPIResult* result, const CMPIObjectPath* ref,
-                       const char** properties) {
+CMPIStatus getInstance(const CMPIBroker* broker, const Publish& publish, const CMPIResult* result,
+                       const CMPIObjectPath* ref, const char** properties) {
   bool found = false;
   const std::string nameSpace = nameSpaceOf(ref, nullptr);
   const std::string className = classNameOf(ref, nullptr);

@@ -39,6 +39,7 @@
 #include "server/Entrances.h"
 #include "server/MakeCertificate.h"
 #include "server/MetricsPage.h"
+#include "server/ServerChecks.h"
 #include "server/SettingOrigins.h"
 #include "server/Systemd.h"
 #include "server/Watchers.h"
@@ -422,6 +423,7 @@ std::unique_ptr<broker::Broker> makeBuiltInBroker(const Config& config) {
   const auto classes = schema::loadBuiltInClasses(schema::ClassSet::Interop);
   frontend::addProviders(config.addedProviders, options.registry, *classes);
   serveSettingOrigins(options);
+  serveServerChecks(options);
   cimom::serveInterop(options);
   return std::make_unique<broker::Broker>(classes, std::move(options));
 }

@@ -14,7 +14,7 @@ import tempfile
 import time
 import traceback
 
-from server import PASSWORDS, THIS_HOST, Server, host, interface, large_host, usual_host
+from server import PASSWORDS, THIS_HOST, DnsServer, Server, USUAL, host, interface, large_host, usual_host
 from webdriver import Browser
 
 HERE = pathlib.Path(__file__).resolve().parent
@@ -160,6 +160,37 @@ def interface_says_where_each_setting_comes_from(test):
     browser.wait_text("ifcfg-eth0", ".settings")
     expect_equal(browser.run(sources)[2][1], "ifcfg-eth0")
     browser.wait_text("Servers of the owner")
+
+
+CHECKS = "return [...document.querySelectorAll('.checks tbody tr')].map((row) => [...row.children].map((cell) => cell.innerText));"
+
+
+@case
+def checks_say_what_zorvactl_check_says(test):
+    good, wrong = DnsServer(), DnsServer(code=3)
+    tree = host(*(interface(name, **{**USUAL, "dns_suffixes": [suffix]}, dns_server_addresses=["127.0.0.1"], dns_servers_in_full=[dns.address])
+                  for name, suffix, dns in [("eth0", "example.org", good), ("eth1", "example.net", wrong)]))
+    server, browser = test.server(tree), test.browser()
+    show(browser, server.plain)
+    browser.wait_text("Refresh asks again", "#checks")
+    rows = browser.run(CHECKS)
+    expect_equal([[row[0], *row[2:]] for row in rows[:2]], [[wrong.address, "NXDOMAIN", "eth1"], [good.address, "NOERROR", "eth0"]])
+    expect_equal(rows[2:], [["example.net", "does not resolve", "eth1"], ["example.org", "resolves", "eth0"]])
+    found = json.loads(server.control("check", "--output", "json", check=False))
+    expect_equal({each["server"]: each["code"] for each in found["servers"]}, {row[0]: row[2] for row in rows[:2]})
+    expect_equal({each["suffix"]: each["resolves"] for each in found["suffixes"]}, {row[0]: row[1] == "resolves" for row in rows[2:]})
+    expect_accessible(browser, "checks")
+    expect_no_complaints(browser)
+    server.write_tree(host(interface("eth0", **USUAL, dns_server_addresses=["127.0.0.1"], dns_servers_in_full=[good.address])))
+    browser.click_text("Refresh")
+    browser.wait("return !document.querySelector('#checks').innerText.includes('NXDOMAIN');", "answers of the servers that are left")
+
+
+@case
+def checks_of_a_host_without_servers_say_so(test):
+    server, browser = test.server(host(interface("eth0", **USUAL))), test.browser()
+    show(browser, server.plain)
+    browser.wait_text("There is no DNS server to ask", "#checks")
 
 
 @case

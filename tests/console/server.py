@@ -3,7 +3,9 @@ import json
 import os
 import pathlib
 import re
+import socket
 import subprocess
+import threading
 
 from webdriver import free_port
 
@@ -43,6 +45,23 @@ def usual_host():
 def large_host(count):
     return host(*(interface(f"veth{i}", **USUAL, dns_server_addresses=[f"10.{i >> 16 & 255}.{i >> 8 & 255}.{i & 255}", "192.0.2.53"],
                             dns_owner="systemd-networkd") for i in range(count)))
+
+
+class DnsServer:
+    """Answers every question with this code. 0: without an error, 3: no such name."""
+
+    def __init__(self, code=0):
+        self.code = code
+        self.socket = socket.socket(socket.AF_INET, socket.SOCK_DGRAM)
+        self.socket.bind(("127.0.0.1", 0))
+        self.address = f"127.0.0.1:{self.socket.getsockname()[1]}"
+        threading.Thread(target=self.serve, daemon=True).start()
+
+    def serve(self):
+        while True:
+            query, client = self.socket.recvfrom(4096)
+            end = query.index(b"\0", 12) + 5  # of the question: its name, type and class
+            self.socket.sendto(query[:2] + bytes([0x81, 0x80 | self.code, 0, 1, 0, 0, 0, 0, 0, 0]) + query[12:end], client)
 
 
 class Server:
@@ -88,8 +107,8 @@ target = "log"
         (self.folder / "tree.json").write_text(json.dumps(tree))
 
     def control(self, *words, **more):
-        return subprocess.run([str(self.build / "bin" / "zorvactl"), *words], check=True, capture_output=True, text=True,
-                              env=self.environment, **more).stdout
+        return subprocess.run([str(self.build / "bin" / "zorvactl"), *words],
+                              **{"check": True, "capture_output": True, "text": True, "env": self.environment, **more}).stdout
 
     def servers_of(self, name):
         """What the host says, in another way than by the console."""
