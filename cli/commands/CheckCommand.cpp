@@ -92,7 +92,8 @@ void checkHost(const Globals& globals, const CheckOptions& options) {
   if (globals.server) {
     throw Failure(ExitCode::WrongUsage,
                   "zorvactl check asks the DNS servers from this host, and not from that of a URL",
-                  "leave out --url, and run it on the host that is meant");
+                  "run it on that host without --url, or see what its servers answer to it: zorvactl ei "
+                  "ZORVA_DNSServerCheck --url URL");
   }
   Session session(globals);
   const dns::CheckResult result = resultOf(session, options);
