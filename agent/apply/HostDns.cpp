@@ -92,7 +92,7 @@ std::vector<HostInterface> HostDns::interfaces() const {
   std::vector<HostInterface> interfaces;
   for (const Node& node : tree_->nodes()) {
     if (node.type() != NodeType::NetworkIPConfig) continue;
-    const std::string name = node.textOrEmpty(PROP_NAME);
+    const std::string& name = node.textOrEmpty(PROP_NAME);
     const bool isOfBmc = tree_->parent(tree_->parent(node)).isServiceProcessor();
     interfaces.push_back(isOfBmc ? interfaceOfBmc(node, name) : interfaceOf(name, node.path()));
   }
