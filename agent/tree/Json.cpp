@@ -3,9 +3,9 @@
 #include <algorithm>
 #include <iterator>
 #include <memory>
-#include <nlohmann/json.hpp>
 #include <utility>
 
+#include "agent/tree/PlainJson.h"
 #include "util/ReadFile.h"
 #include "util/Utf8.h"
 
@@ -34,6 +34,8 @@ std::string bytesToJson(std::string_view bytes) {
 }
 
 std::string jsonToBytes(std::string_view text) {
+  constexpr char kLeadOfPrivatePlane = '\xF4';
+  if (text.find(kLeadOfPrivatePlane) == std::string_view::npos) return std::string(text);
   std::string bytes;
   bytes.reserve(text.size());
   while (!text.empty()) {
@@ -48,8 +50,9 @@ std::string jsonToBytes(std::string_view text) {
   return bytes;
 }
 
-// Passes the text to the parser and reports its progress.
-class TrackingIterator {
+// Passes the text to the parser and counts lines up to the last character that the parser read. That is the end of the
+// current token, or for a number the character after it, which may be a line feed but is itself still on the line.
+class LineCounter {
  public:
   using iterator_category = std::input_iterator_tag;
   using value_type = char;
@@ -57,45 +60,29 @@ class TrackingIterator {
   using pointer = const char*;
   using reference = const char&;
 
-  TrackingIterator(const char* place, const char** reached) : place_(place), reached_(reached) {}
+  LineCounter(const char* place, int& line) : place_(place), line_(&line) {}
   reference operator*() const { return *place_; }
-  TrackingIterator& operator++() {
-    *reached_ = place_;
+  LineCounter& operator++() {
+    if (afterLineFeed_) ++*line_;
+    afterLineFeed_ = *place_ == '\n';
     ++place_;
     return *this;
   }
-  bool operator==(const TrackingIterator& other) const { return place_ == other.place_; }
+  bool operator==(const LineCounter& other) const { return place_ == other.place_; }
 
  private:
   const char* place_;
-  const char** reached_;  // the last character that was taken
+  int* line_;
+  bool afterLineFeed_ = false;
 };
 
-// Counts lines up to the last character that the parser read. That is the end of the current token, or for a number the
-// character after it, which may be a line feed but is itself still on the line.
-class LineCounter {
+// Builds the value while a parser runs. The plain reader relies on the limit of the depth: it needs stack for each
+// level.
+class Builder final : public JsonEvents {
  public:
-  explicit LineCounter(const std::string& text) : counted_(text.data()), reached_(text.data()) {}
-
-  const char** reached() { return &reached_; }
-
-  int line() {
-    line_ += static_cast<int>(std::count(counted_, reached_, '\n'));
-    counted_ = reached_;
-    return line_;
-  }
-
- private:
-  const char* counted_;
-  const char* reached_;
-  int line_ = 1;
-};
-
-// Builds the value while the parser runs. The parser itself needs no stack for nested values.
-class Builder : public nlohmann::json_sax<nlohmann::json> {
- public:
-  Builder(const std::string& name, LineCounter& lines, std::size_t mostValues)
-      : name_(name), lines_(lines), mostValues_(mostValues) {}
+  /// The line is that of the current event.
+  Builder(const std::string& name, const int& line, std::size_t mostValues)
+      : name_(name), line_(line), mostValues_(mostValues) {}
 
   JsonValue take() { return std::move(root_); }
 
@@ -146,14 +133,14 @@ class Builder : public nlohmann::json_sax<nlohmann::json> {
     // "[json.exception.parse_error.101] parse error at line 1, column 2: what is wrong"
     const std::string text = error.what();
     const std::size_t place = text.find(": ");
-    throw ConfigError(name_, lines_.line(), {}, place == std::string::npos ? text : text.substr(place + 2));
+    throw ConfigError(name_, line_, {}, place == std::string::npos ? text : text.substr(place + 2));
   }
 
  private:
   JsonValue& place(JsonValue::Kind kind) {
     JsonValue& value = open_.empty() ? root_ : open_.back()->items.emplace_back();
     value.kind = kind;
-    value.line = lines_.line();
+    value.line = line_;
     if (++values_ > mostValues_) {
       throw ConfigError(name_, value.line, {}, "has more than " + std::to_string(mostValues_) + " values");
     }
@@ -180,7 +167,7 @@ class Builder : public nlohmann::json_sax<nlohmann::json> {
   }
 
   const std::string& name_;
-  LineCounter& lines_;
+  const int& line_;
   std::size_t mostValues_;
   std::size_t values_ = 0;
   JsonValue root_;
@@ -292,11 +279,14 @@ const JsonValue* JsonValue::find(std::string_view key) const {
 
 JsonValue parseJson(const std::string& text, const std::string& name, std::size_t mostValues) {
   if (text.size() > kLargestJson) throw ConfigError(name, 0, {}, "is larger than 64 MiB");
-  LineCounter lines(text);
-  Builder builder(name, lines, mostValues);
-  const TrackingIterator begin(text.data(), lines.reached());
-  const TrackingIterator end(text.data() + text.size(), lines.reached());
-  nlohmann::json::sax_parse(begin, end, &builder);
+  {
+    int line = 1;
+    Builder builder(name, line, mostValues);
+    if (readPlainJson(text, line, builder)) return builder.take();
+  }
+  int line = 1;
+  Builder builder(name, line, mostValues);
+  nlohmann::json::sax_parse(LineCounter(text.data(), line), LineCounter(text.data() + text.size(), line), &builder);
   return builder.take();
 }
 

@@ -80,17 +80,34 @@ constexpr std::array kOrigins{
     OriginName{AddressOrigin::LinkLocal, "link-local"},
 };
 
-// The place of a value, for errors: the document and the keys that lead there, as in nodes[0].children[1].name.
-struct Place {
-  const std::string& document;
-  std::string key;
+// The place of a value, for errors: the document and the keys that lead there, as in nodes[0].children[1].name. It
+// refers to the place around it, so that keys are composed only for an error.
+class Place {
+ public:
+  Place(const std::string& document, std::string_view key) : document_(document), name_(key) {}
 
-  Place member(const std::string& name) const { return {document, key.empty() ? name : key + '.' + name}; }
-  Place element(std::size_t index) const { return {document, key + '[' + std::to_string(index) + ']'}; }
+  Place member(std::string_view name) const { return Place(*this, name, 0); }
+  Place element(std::size_t index) const { return Place(*this, {}, index); }
 
   [[noreturn]] void fail(const JsonValue& value, const std::string& problem) const {
-    throw ConfigError(document, value.line, key, problem);
+    throw ConfigError(document_, value.line, key(), problem);
   }
+
+ private:
+  Place(const Place& around, std::string_view name, std::size_t index)
+      : document_(around.document_), around_(&around), name_(name), index_(index) {}
+
+  std::string key() const {
+    std::string text = around_ == nullptr ? std::string() : around_->key();
+    if (name_.data() == nullptr) return text + '[' + std::to_string(index_) + ']';
+    if (!text.empty()) text += '.';
+    return text.append(name_);
+  }
+
+  const std::string& document_;
+  const Place* around_ = nullptr;
+  std::string_view name_;  // null for an element of a list
+  std::size_t index_ = 0;
 };
 
 const std::string& textOf(const JsonValue& value, const Place& place) {
@@ -307,7 +324,7 @@ PropertyNumber propertyNumber(std::string_view name) {
 
 PropertyValue propertyFromJson(PropertyNumber number, const JsonValue& value, const std::string& document,
                                const std::string& key) {
-  return valueOf(number, value, Place{document, key});
+  return valueOf(number, value, Place(document, key));
 }
 
 JsonValue propertyToJson(const PropertyValue& value) {
@@ -326,7 +343,7 @@ JsonValue treeToJsonValue(const TreeSnapshot& tree) {
 }
 
 std::shared_ptr<const TreeSnapshot> treeFromJsonValue(const JsonValue& document, const std::string& name) {
-  const Place place{name, {}};
+  const Place place(name, "");
   checkObject(document, place, {"version", "system_name", "nodes"});
   if (const JsonValue* version = document.find("version"); version != nullptr) {
     if (version->kind != Kind::Number || version->number != kTreeVersion) {
