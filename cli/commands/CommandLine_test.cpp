@@ -60,6 +60,48 @@ TEST(CommandLine, KnowsTheShortNamesOfItsSubcommands) {
   EXPECT_FALSE(tellingOf({"cm", "P", "M"}).isError);
 }
 
+// The names of all subcommands, with short ones and hidden ones.
+std::vector<std::string> allNames() {
+  CommandLine line;
+  addCommands(line);
+  std::vector<std::string> names{"guard-trial"};  // hidden
+  for (const manual::Command& command : line.description().commands) {
+    names.push_back(command.name());
+    names.insert(names.end(), command.aliases.begin(), command.aliases.end());
+  }
+  return names;
+}
+
+bool describesTheOthers(const std::string& name) { return name == "help" || name == "completion"; }
+
+TEST(CommandLine, ASubcommandAloneIsWhatItIsAmongAll) {
+  CommandLine all;
+  addCommands(all);
+  for (const std::string& name : allNames()) {
+    CommandLine one;
+    ASSERT_EQ(addNamedCommands(one, {"--output", "json", name, "C"}), !describesTheOthers(name)) << name;
+    if (describesTheOthers(name)) continue;
+    EXPECT_LT(one.description().commands.size(), 5U) << name << " is registered with its family";
+    const std::vector<const char*> help{"zorvactl", name.c_str(), "--help"};
+    EXPECT_EQ(one.read(3, help.data()).value().text, tellingOf({name.c_str(), "--help"}).text);
+  }
+}
+
+TEST(CommandLine, WordsThatNameSeveralSubcommandsOrNoneLeaveNothingOut) {
+  for (const std::vector<std::string_view>& words : {std::vector<std::string_view>{},
+                                                     {"--help"},
+                                                     {"frob"},
+                                                     {"help"},
+                                                     {"complete", "x"},
+                                                     {"help", "show"},
+                                                     {"overlay", "show"},
+                                                     {"ei", "tree"}}) {
+    CommandLine line;
+    EXPECT_FALSE(addNamedCommands(line, words));
+    EXPECT_TRUE(line.description().commands.empty());
+  }
+}
+
 /// The values that a test's subcommand has read.
 struct Seen {
   std::string path;

@@ -3,12 +3,21 @@
 // The subcommands of zorvactl. Each function registers one of them, or a family, with its words and options; what it
 // does is in the source of the same name.
 
+#include <string>
+#include <string_view>
+#include <vector>
+
 #include "cli/commands/CommandLine.h"
 
 namespace zorva::cli {
 
 /// Registers all of them.
 void addCommands(CommandLine& line);
+
+/// Registers the only one, or the only family, that these words name: most of the time that a small command takes would
+/// be spent on the others. False, with nothing registered, if they name none or several. Then, and for help and errors,
+/// all must be registered.
+bool addNamedCommands(CommandLine& line, const std::vector<std::string_view>& words);
 
 void addShowCommand(CommandLine& line);
 void addCheckCommand(CommandLine& line);
