@@ -73,7 +73,7 @@ PROVIDERS = [
 ]
 
 PROCESS = [
-    Figure("zorvactl ei ZORVA_DNSProtocolEndPoint, to ip -json addr show", 5, "process",
+    Figure("zorvactl ei ZORVA_DNSProtocolEndPoint, to ip -json addr show", 3, "process",
            "zorvactl ei ZORVA_DNSProtocolEndPoint", "ip -json addr show"),
 ]
 

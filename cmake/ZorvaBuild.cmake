@@ -81,18 +81,27 @@ function(zorva_limit_exports target file)
   target_compile_options(${target} PRIVATE $<$<CXX_COMPILER_ID:GNU>:-fno-gnu-unique>)
 endfunction()
 
+# ThreadSanitizer cannot map its shadow memory if the kernel randomizes addresses too widely.
+set(ZORVA_LAUNCHER)
+if(ZORVA_SANITIZE STREQUAL "thread")
+  set(ZORVA_LAUNCHER setarch -R)
+endif()
+
+# zorva_run_at_build(PROGRAM OUTPUT file ARGUMENTS arguments... DEPENDS files...): PROGRAM, of this build, makes the file.
+function(zorva_run_at_build program)
+  cmake_parse_arguments(PARSE_ARGV 1 run "" OUTPUT "ARGUMENTS;DEPENDS")
+  add_custom_command(OUTPUT ${run_OUTPUT}
+    COMMAND ${ZORVA_LAUNCHER} $<TARGET_FILE:${program}> ${run_ARGUMENTS}
+    DEPENDS ${program} ${run_DEPENDS} VERBATIM)
+endfunction()
+
 # zorva_add_manual(PROGRAM WORD): once it is built, PROGRAM writes its manual and what else is made of its texts into
 # manual/PROGRAM of the build folder, as "PROGRAM WORD FOLDER". Its pages are installed.
 function(zorva_add_manual program word)
-  set(launcher)
-  if(ZORVA_SANITIZE STREQUAL "thread")
-    # ThreadSanitizer cannot map its shadow memory if the kernel randomizes addresses too widely.
-    set(launcher setarch -R)
-  endif()
   set(folder ${CMAKE_BINARY_DIR}/manual/${program})
   add_custom_command(OUTPUT ${folder}/done
     COMMAND ${CMAKE_COMMAND} -E rm -rf ${folder}
-    COMMAND ${launcher} $<TARGET_FILE:${program}> ${word} ${folder}
+    COMMAND ${ZORVA_LAUNCHER} $<TARGET_FILE:${program}> ${word} ${folder}
     COMMAND ${CMAKE_COMMAND} -E touch ${folder}/done
     DEPENDS ${program} VERBATIM)
   add_custom_target(${program}_manual ALL DEPENDS ${folder}/done)

@@ -181,6 +181,12 @@ struct ClassDeclaration {
   Place place;
 };
 
+/// All that a repository is made of: each class comes after those that it names.
+struct Declarations {
+  std::vector<QualifierType> qualifierTypes;
+  std::vector<ClassDeclaration> classes;
+};
+
 /// `instance of CIM_X as $a { Name = "n"; };`
 struct InstanceProperty {
   Qualifiers qualifiers;

@@ -39,6 +39,16 @@ class RepositorySink : public MofSink {
   ClassRepository& repository_;
 };
 
+/// A sink that keeps qualifier types and classes and refuses instances.
+class DeclarationsSink : public MofSink {
+ public:
+  Expected<void, SchemaError> qualifierType(QualifierType type, std::string_view file) override;
+  Expected<void, SchemaError> classDeclaration(ClassDeclaration declaration, std::string_view file) override;
+  Expected<void, SchemaError> instance(InstanceDeclaration instance, std::string_view file) override;
+
+  Declarations declarations;
+};
+
 /// The result of a `#pragma include`: its name in errors and its text, or why it cannot be read.
 struct MofInclude {
   std::string file;

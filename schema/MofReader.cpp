@@ -463,6 +463,11 @@ MofInclude readFile(const std::string& path, std::size_t limit) {
   return read;
 }
 
+Expected<void, SchemaError> refuseInstance(const InstanceDeclaration& instance, std::string_view file) {
+  return unexpected(SchemaError{std::string(file), instance.place.line, instance.place.column,
+                                "an instance of '" + instance.className + "' is among the classes"});
+}
+
 std::string besideFile(std::string_view name, std::string_view from) {
   const std::size_t slash = from.rfind('/');
   if (name.starts_with('/') || slash == std::string_view::npos) return std::string(name);
@@ -480,8 +485,21 @@ Expected<void, SchemaError> RepositorySink::classDeclaration(ClassDeclaration de
 }
 
 Expected<void, SchemaError> RepositorySink::instance(InstanceDeclaration instance, std::string_view file) {
-  return unexpected(SchemaError{std::string(file), instance.place.line, instance.place.column,
-                                "an instance of '" + instance.className + "' is among the classes"});
+  return refuseInstance(instance, file);
+}
+
+Expected<void, SchemaError> DeclarationsSink::qualifierType(QualifierType type, std::string_view) {
+  declarations.qualifierTypes.push_back(std::move(type));
+  return {};
+}
+
+Expected<void, SchemaError> DeclarationsSink::classDeclaration(ClassDeclaration declaration, std::string_view) {
+  declarations.classes.push_back(std::move(declaration));
+  return {};
+}
+
+Expected<void, SchemaError> DeclarationsSink::instance(InstanceDeclaration instance, std::string_view file) {
+  return refuseInstance(instance, file);
 }
 
 Expected<void, SchemaError> parseMof(std::string_view text, std::string_view file, MofSink& sink,

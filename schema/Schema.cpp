@@ -1,20 +1,23 @@
 #include "schema/Schema.h"
 
 #include <stdexcept>
+#include <utility>
 
-#include "schema/BuiltInMof.h"
-#include "schema/Mof.h"
+#include "schema/BuiltInClasses.h"
+#include "schema/CompiledClasses.h"
 #include "util/Names.h"
 
 namespace zorva::schema {
 
 namespace {
 
-MofInclude builtInFile(std::string_view name) {
-  for (std::size_t i = 0; i < kBuiltInMofCount; ++i) {
-    if (kBuiltInMof[i].name == name) return {std::string(name), std::string(kBuiltInMof[i].text), {}};
-  }
-  return {std::string(name), {}, "there is no such file in the program"};
+void addTo(ClassRepository& classes, std::string_view compiled) {
+  Declarations declarations = readCompiledDeclarations(compiled);
+  const auto require = [](const Expected<void, SchemaError>& outcome) {
+    if (!outcome) throw std::logic_error("the built-in schema is wrong: " + outcome.error().text());
+  };
+  for (QualifierType& type : declarations.qualifierTypes) require(classes.add(std::move(type)));
+  for (ClassDeclaration& declaration : declarations.classes) require(classes.add(std::move(declaration)));
 }
 
 std::string_view withoutSlashes(std::string_view name) noexcept {
@@ -27,12 +30,8 @@ std::string_view withoutSlashes(std::string_view name) noexcept {
 
 std::shared_ptr<ClassRepository> loadBuiltInClasses(ClassSet set) {
   auto classes = std::make_shared<ClassRepository>();
-  RepositorySink sink(*classes);
-  const MofInclude top = builtInFile(set == ClassSet::Interop ? "interop.mof" : "profile.mof");
-  const auto includer = [](std::string_view name, std::string_view) { return builtInFile(name); };
-  if (const auto outcome = parseMof(top.text, top.file, sink, includer); !outcome) {
-    throw std::logic_error("the built-in schema cannot be read: " + outcome.error().text());
-  }
+  addTo(*classes, kProfileClasses);
+  if (set == ClassSet::Interop) addTo(*classes, kInteropClasses);
   return classes;
 }
 

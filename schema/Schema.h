@@ -1,6 +1,6 @@
 #pragma once
 
-// The built-in classes: the MOF files of this folder, embedded in the binary as text, and read when they are needed.
+// The built-in classes: those of the MOF files of this folder, embedded in the binary in a compact form.
 
 #include <memory>
 #include <string_view>
@@ -16,8 +16,9 @@ enum class ClassSet {
             ///< profiles
 };
 
-/// The built-in classes, read again at each call, so keep the result. The caller may add others. The built-in text is
-/// valid (a test reads it); if it were not, the call would throw std::logic_error. Safe on any thread.
+/// The built-in classes, made again at each call, so keep the result. The caller may add others. The compiled form is
+/// valid (a test compares it with the MOF files); if it were not, the call would throw std::logic_error. Safe on any
+/// thread.
 std::shared_ptr<ClassRepository> loadBuiltInClasses(ClassSet set = ClassSet::Profile);
 
 /// Namespaces are compared without regard to case and to slashes at either end.
