@@ -32,19 +32,33 @@ enum LogLevel : int {
 /// A longer line is truncated.
 constexpr std::size_t kMessageBufferSize = 512;
 
-/// Composes a line in a buffer of that size. The line always has its end; what is too long for it is left out.
+/// A line and its size. The bytes after the line are zero.
+struct LineBuffer {
+  char text[kMessageBufferSize];
+  std::size_t size;
+};
+
+/// Composes a line in a buffer. The line always has its end; what is too long for it is left out.
 class LineWriter {
  public:
-  explicit LineWriter(char (&buffer)[kMessageBufferSize]) : at_(buffer), end_(buffer + kMessageBufferSize - 1) {
-    std::memset(buffer, 0, sizeof buffer);
-  }
+  explicit LineWriter(LineBuffer& buffer)
+      : buffer_(buffer), at_(buffer.text), end_(buffer.text + kMessageBufferSize - 1) {}
 
+  /// Returns the line.
   template <typename... Pieces>
-  void write(const Pieces&... pieces) {
+  const char* write(const Pieces&... pieces) {
     (append(pieces), ...);
+    clearRestOfLastLine();
+    return buffer_.text;
   }
 
  private:
+  void clearRestOfLastLine() {
+    const auto size = static_cast<std::size_t>(at_ - buffer_.text);
+    if (size < buffer_.size) std::memset(at_, 0, buffer_.size - size);
+    buffer_.size = size;
+  }
+
   void append(std::string_view text) {
     const std::size_t size = std::min(text.size(), static_cast<std::size_t>(end_ - at_));
     std::memcpy(at_, text.data(), size);
@@ -64,11 +78,17 @@ class LineWriter {
 
   /// Signed, because the lines show a number so. A number that does not fit is cut off like a text.
   void append(unsigned int number) {
+    const auto shown = static_cast<int>(number);
+    if (const auto written = std::to_chars(at_, end_, shown); written.ec == std::errc()) {
+      at_ = written.ptr;
+      return;
+    }
     char digits[std::numeric_limits<int>::digits10 + 2];
-    const auto end = std::to_chars(std::begin(digits), std::end(digits), static_cast<int>(number)).ptr;
+    const auto end = std::to_chars(std::begin(digits), std::end(digits), shown).ptr;
     append(std::string_view(std::begin(digits), static_cast<std::size_t>(end - digits)));
   }
 
+  LineBuffer& buffer_;
   char* at_;
   char* const end_;
 };
@@ -77,47 +97,45 @@ class LineWriter {
 // again on its thread. Null text prints as "(null)".
 
 inline const char* trace(const char* text, const char* file, unsigned int line, MessageType type) {
-  static thread_local char messageBuffer[kMessageBufferSize];
+  static thread_local LineBuffer messageBuffer;
   LineWriter writer(messageBuffer);
   if (type == MSG_METHOD) {
-    writer.write("METHOD: ", text, "() was invoked in ", file, " [Line: ", line, "]");
-  } else if (type == MSG_MESSAGE) {
-    writer.write("MESSAGE [File: ", file, ", Line: ", line, "]: ", text);
-  } else if (type == MSG_EXITING) {
-    writer.write("EXITING: ", text, "() in ", file, " [Line: ", line, "]");
-  } else {
-    writer.write("ENTERING: ", text, "() in ", file, " [Line: ", line, "]");
+    return writer.write("METHOD: ", text, "() was invoked in ", file, " [Line: ", line, "]");
   }
-  return messageBuffer;
+  if (type == MSG_MESSAGE) {
+    return writer.write("MESSAGE [File: ", file, ", Line: ", line, "]: ", text);
+  }
+  if (type == MSG_EXITING) {
+    return writer.write("EXITING: ", text, "() in ", file, " [Line: ", line, "]");
+  }
+  return writer.write("ENTERING: ", text, "() in ", file, " [Line: ", line, "]");
 }
 
 inline const char* tracepara(const char* text, const char* file, unsigned int line, const char* parameters,
                              MessageType type) {
-  static thread_local char messageBuffer[kMessageBufferSize];
+  static thread_local LineBuffer messageBuffer;
   constexpr char kParameters[] = ",Parameters List: ";
   LineWriter writer(messageBuffer);
   if (type == MSG_METHOD) {
-    writer.write("METHOD: ", text, "() was invoked in ", file, " [Line: ", line, "]", kParameters, parameters);
-  } else if (type == MSG_MESSAGE) {
-    writer.write("MESSAGE [File: ", file, ", Line: ", line, "]: ", text, kParameters, parameters);
-  } else if (type == MSG_EXITING) {
-    writer.write("EXITING: ", text, "() in ", file, " [Line: ", line, "]", kParameters, parameters);
-  } else {
-    writer.write("ENTERING: ", text, "() in ", file, " [Line: ", line, "]", kParameters, parameters);
+    return writer.write("METHOD: ", text, "() was invoked in ", file, " [Line: ", line, "]", kParameters, parameters);
   }
-  return messageBuffer;
+  if (type == MSG_MESSAGE) {
+    return writer.write("MESSAGE [File: ", file, ", Line: ", line, "]: ", text, kParameters, parameters);
+  }
+  if (type == MSG_EXITING) {
+    return writer.write("EXITING: ", text, "() in ", file, " [Line: ", line, "]", kParameters, parameters);
+  }
+  return writer.write("ENTERING: ", text, "() in ", file, " [Line: ", line, "]", kParameters, parameters);
 }
 
 inline const char* trace(const char* name, const char* file, unsigned int line, unsigned int value) {
-  static thread_local char messageBuffer[kMessageBufferSize];
-  LineWriter(messageBuffer).write("VARIABLE: '", name, "' has Value '", value, "' at line ", line, " in ", file);
-  return messageBuffer;
+  static thread_local LineBuffer messageBuffer;
+  return LineWriter(messageBuffer).write("VARIABLE: '", name, "' has Value '", value, "' at line ", line, " in ", file);
 }
 
 inline const char* trace(const char* name, const char* file, unsigned int line, const char* value) {
-  static thread_local char messageBuffer[kMessageBufferSize];
-  LineWriter(messageBuffer).write("VARIABLE: '", name, "' has Value '", value, "' at line ", line, " in ", file);
-  return messageBuffer;
+  static thread_local LineBuffer messageBuffer;
+  return LineWriter(messageBuffer).write("VARIABLE: '", name, "' has Value '", value, "' at line ", line, " in ", file);
 }
 
 /// A statement's place in its source. The default argument of a function is the place of the statement that calls it.
@@ -171,11 +189,11 @@ inline void logVariable(const std::string& logger, const LogSite& site, const ch
 }
 
 /// One label or value of a parameter list: text unchanged, a bool as the stream prints it, anything else as its
-/// address.
+/// address. The stream prints a bool as one digit, in each locale.
 template <typename T>
 void appendParameter(ZALog::ZAMessageBuffer& buffer, const T& labelOrValue) {
   if constexpr (std::is_same_v<T, bool>) {
-    static_cast<std::ostream&>(buffer) << labelOrValue;
+    buffer << (labelOrValue ? "1" : "0");
   } else if constexpr (std::is_convertible_v<T, const char*>) {
     buffer << static_cast<const char*>(labelOrValue);
   } else {

@@ -80,6 +80,15 @@ TEST(TraceForms, EachFormatterUsesItsLineAgain) {
   EXPECT_STREQ("MESSAGE [File: a.cpp, Line: 1]: x", second);
 }
 
+TEST(TraceForms, BytesAfterALineAreZero) {
+  trace(std::string(600, 'x').c_str(), "a.cpp", 1, MSG_MESSAGE);
+  for (const char* text : {"a name", "another name that is longer", ""}) {
+    const char* const line = trace(text, "a.cpp", 1, MSG_MESSAGE);
+    const std::string rest(line + std::strlen(line), line + kMessageBufferSize);
+    EXPECT_EQ(std::string(rest.size(), '\0'), rest) << text;
+  }
+}
+
 // The length of a line whose text has that many characters.
 std::size_t lengthWith(std::size_t textLength) {
   return std::strlen(trace(std::string(textLength, 'x').c_str(), "a.cpp", 1, MSG_MESSAGE));

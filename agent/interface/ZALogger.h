@@ -48,9 +48,10 @@ class ZORVA_AGENT_API ZAMessageBuffer {
   const std::string& str(std::ostream& stream);
 
  private:
+  struct Thread;
   class Room;
   class Shelf;
-  static Shelf& shelf();
+  static Shelf shelf_;
 
   Room* const room_;  ///< what the text lies in; others use it afterwards
 };

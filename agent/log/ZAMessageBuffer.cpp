@@ -1,6 +1,7 @@
 #include <array>
 #include <atomic>
 #include <cstdint>
+#include <cstring>
 #include <iterator>
 #include <locale>
 #include <optional>
@@ -43,6 +44,17 @@ struct Stream {
 // A room does not keep more than this between two lines.
 constexpr std::size_t kKeptText = 4096;
 
+// The two hexadecimal digits of each byte.
+constexpr std::array<char, 512> kHexPairs = [] {
+  constexpr std::string_view kDigits = "0123456789abcdef";
+  std::array<char, 512> pairs{};
+  for (std::size_t byte = 0; byte < 256; ++byte) {
+    pairs[2 * byte] = kDigits[byte / 16];
+    pairs[2 * byte + 1] = kDigits[byte % 16];
+  }
+  return pairs;
+}();
+
 bool isAsNew(const std::ostream& stream) {
   return stream.flags() == (std::ios_base::skipws | std::ios_base::dec) && stream.width() == 0 &&
          stream.precision() == 6 && stream.fill() == ' ' && stream.good() &&
@@ -50,6 +62,12 @@ bool isAsNew(const std::ostream& stream) {
 }
 
 }  // namespace
+
+// The buffers that a thread fills now. Trivial, so that the library can be unloaded while the thread goes on.
+struct ZAMessageBuffer::Thread {
+  unsigned firstPlace;
+  unsigned buffers;
+};
 
 // What a buffer needs. The next buffer uses it again, so that a line allocates nothing.
 class ZAMessageBuffer::Room {
@@ -75,6 +93,7 @@ class ZAMessageBuffer::Room {
   }
 
   std::string text;
+  Thread* thread = nullptr;  // of the buffer
 
  private:
   std::optional<Stream> stream_;
@@ -86,6 +105,8 @@ class ZAMessageBuffer::Room {
 // often composes a part of it in a second buffer.
 class ZAMessageBuffer::Shelf {
  public:
+  constexpr Shelf() = default;
+
   ~Shelf() {
     for (auto& place : places_) delete place.exchange(nullptr);
   }
@@ -93,22 +114,18 @@ class ZAMessageBuffer::Shelf {
   Room* take() {
     Thread& mine = thread();
     Room* room = place(mine, mine.buffers++).exchange(nullptr, std::memory_order_acquire);
-    return room != nullptr ? room : new Room;
+    if (room == nullptr) room = new Room;
+    room->thread = &mine;
+    return room;
   }
 
   void giveBack(Room* room) {
-    Thread& mine = thread();
+    Thread& mine = *room->thread;
     room->clear();
     delete place(mine, --mine.buffers).exchange(room, std::memory_order_acq_rel);
   }
 
  private:
-  // Trivial, so that the library can be unloaded while the thread goes on.
-  struct Thread {
-    unsigned firstPlace;
-    unsigned buffers;
-  };
-
   Thread& thread() {
     static thread_local Thread mine{kPlaces, 0};
     if (mine.firstPlace == kPlaces) mine.firstPlace = 2 * threads_.fetch_add(1, std::memory_order_relaxed) % kPlaces;
@@ -122,14 +139,11 @@ class ZAMessageBuffer::Shelf {
   std::array<std::atomic<Room*>, kPlaces> places_{};
 };
 
-ZAMessageBuffer::Shelf& ZAMessageBuffer::shelf() {
-  static Shelf shelf;
-  return shelf;
-}
+constinit ZAMessageBuffer::Shelf ZAMessageBuffer::shelf_;
 
-ZAMessageBuffer::ZAMessageBuffer() : room_(shelf().take()) {}
+ZAMessageBuffer::ZAMessageBuffer() : room_(shelf_.take()) {}
 
-ZAMessageBuffer::~ZAMessageBuffer() { shelf().giveBack(room_); }
+ZAMessageBuffer::~ZAMessageBuffer() { shelf_.giveBack(room_); }
 
 ZAMessageBuffer& ZAMessageBuffer::operator<<(const char* text) {
   if (text != nullptr) room_->text.append(text);
@@ -141,19 +155,13 @@ ZAMessageBuffer& ZAMessageBuffer::appendAddress(const void* address) {
     room_->stream() << address;
     return *this;
   }
-  constexpr std::string_view kDigits = "0123456789abcdef";
   char text[2 + 2 * sizeof address];
   char* begin = std::end(text);
   auto rest = reinterpret_cast<std::uintptr_t>(address);
-  do {
-    *--begin = kDigits[rest % 16];
-    rest /= 16;
-  } while (rest != 0);
-  if (address != nullptr) {
-    *--begin = 'x';
-    *--begin = '0';
-  }
-  room_->text.append(begin, std::end(text));
+  for (; rest > 0xF; rest >>= 8) std::memcpy(begin -= 2, &kHexPairs[2 * (rest & 0xFF)], 2);
+  if (rest != 0 || address == nullptr) *--begin = kHexPairs[2 * rest + 1];
+  if (address != nullptr) std::memcpy(begin -= 2, "0x", 2);
+  room_->text.append(begin, static_cast<std::size_t>(std::end(text) - begin));
   return *this;
 }
 

@@ -63,8 +63,13 @@ TEST(ZAMessageBuffer, ANullPointerIsZero) {
 }
 
 TEST(ZAMessageBuffer, AnAddressIsWhatTheStreamWrites) {
-  for (std::uintptr_t address : {std::uintptr_t{1}, std::uintptr_t{0xabcdef}, std::uintptr_t{0x7fff12345678},
-                                 std::numeric_limits<std::uintptr_t>::max()}) {
+  std::vector<std::uintptr_t> addresses = {0xabcdef, 0x7fff12345678, std::numeric_limits<std::uintptr_t>::max()};
+  // Each number of digits, with zeros among them.
+  for (std::uintptr_t address = 1; address != 0; address <<= 1) {
+    addresses.push_back(address);
+    addresses.push_back(address - 1);
+  }
+  for (const std::uintptr_t address : addresses) {
     const void* pointer = reinterpret_cast<const void*>(address);
     ZAMessageBuffer buffer;
     EXPECT_EQ(buffer.str(buffer << pointer), addressOf(pointer));
