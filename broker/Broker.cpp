@@ -35,6 +35,17 @@ class SinkTaker : public Taker {
   Instance instance_;
 };
 
+class ObjectTaker : public Taker {
+ public:
+  explicit ObjectTaker(const ObjectSink& sink) : sink_(sink) {}
+
+  bool takeInstance(const InstanceObject& object, const PropertyMask& wanted) override { return sink_(object, wanted); }
+  bool takePath(const PathObject& /*object*/) override { return true; }
+
+ private:
+  const ObjectSink& sink_;
+};
+
 /// Takes the only result.
 class OneTaker : public Taker {
  public:
@@ -128,8 +139,18 @@ Broker::~Broker() = default;
 
 Status Broker::enumerateInstances(std::string_view nameSpace, std::string_view className, const Selection& selection,
                                   const InstanceSink& sink, const Caller& caller) {
+  Instance instance;
+  const auto take = [&](const InstanceObject& object, const PropertyMask& wanted) {
+    fillInstance(object, wanted, instance);
+    return sink(instance);
+  };
+  return enumerateObjects(nameSpace, className, selection, take, caller);
+}
+
+Status Broker::enumerateObjects(std::string_view nameSpace, std::string_view className, const Selection& selection,
+                                const ObjectSink& sink, const Caller& caller) {
   return inRequest(*core_, caller, flagsOf(selection), [&](Request& request) {
-    SinkTaker taker(&sink, nullptr);
+    ObjectTaker taker(sink);
     return request.enumerate(*PathObject::make(request.arena(), nameSpace, className), Form::Instances,
                              shapeOf(selection), taker);
   });

@@ -44,6 +44,8 @@ class Broker : util::NotCopied {
   /// that subclass is skipped with a line in the log, unless no other class is left.
   Status enumerateInstances(std::string_view nameSpace, std::string_view className, const Selection& selection,
                             const InstanceSink& sink, const Caller& caller = {});
+  Status enumerateObjects(std::string_view nameSpace, std::string_view className, const Selection& selection,
+                          const ObjectSink& sink, const Caller& caller = {});
   Status enumerateInstanceNames(std::string_view nameSpace, std::string_view className, const PathSink& sink,
                                 const Caller& caller = {});
 

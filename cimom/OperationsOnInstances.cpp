@@ -8,6 +8,7 @@
 #include "cimom/OperationsArguments.h"
 #include "cimom/OperationsSelection.h"
 #include "cimxml/ElementWriter.h"
+#include "cimxml/ObjectWriter.h"
 #include "frontend/HostApply.h"
 #include "frontend/ReadBack.h"
 #include "util/Expected.h"
@@ -42,18 +43,13 @@ Status enumerateInstances(Operation& operation) {
   selection.deepInheritance = arguments.boolean("DeepInheritance", true);
   Status status = arguments.status();
   if (!status.ok()) return status;
-  cimxml::InstanceWriter writer(detailOf(operation, selection));
+  cimxml::ObjectWriter writer(detailOf(operation, selection));
   Stream stream(operation.writer);
   operation.writer.beginReturnValue();
-  const auto write = [&](const Instance& instance) {
-    return stream.put([&](std::string& out) {
-      out += "<VALUE.NAMEDINSTANCE>";
-      cimxml::appendInstanceName(out, instance.path);
-      writer.append(out, instance);
-      out += "</VALUE.NAMEDINSTANCE>";
-    });
+  const auto write = [&](const broker::InstanceObject& object, const broker::PropertyMask& wanted) {
+    return stream.put([&](std::string& out) { writer.append(out, object, wanted); });
   };
-  status = operation.broker.enumerateInstances(operation.nameSpace, className, selection, write, operation.caller);
+  status = operation.broker.enumerateObjects(operation.nameSpace, className, selection, write, operation.caller);
   stream.finish();
   operation.writer.endReturnValue();
   return status;

@@ -39,22 +39,22 @@ const char* keyValueType(schema::Type type) noexcept {
   return schema::isUnsigned(type) || schema::isSigned(type) || schema::isReal(type) ? "numeric" : "string";
 }
 
+void appendKeyBindingBegin(std::string& out, const broker::NamedValue& key) {
+  out += "<KEYBINDING";
+  appendAttribute(out, "NAME", key.name);
+  out += '>';
+}
+
 void appendKeyBinding(std::string& out, const broker::NamedValue& key) {
-  out += "<KEYBINDING NAME=\"";
-  appendEscaped(out, key.name);
-  out += "\">";
   if (key.value.type == schema::Type::Reference) {
+    appendKeyBindingBegin(out, key);
     appendValue(out, key.value);
+    out += "</KEYBINDING>";
   } else {
-    out += "<KEYVALUE VALUETYPE=\"";
-    out += keyValueType(key.value.type);
-    out += "\" TYPE=\"";
-    out += schema::typeName(key.value.type);
-    out += "\">";
+    appendKeyBegin(out, key);
     std::visit(ContentWriter(out), key.value.scalar);
-    out += "</KEYVALUE>";
+    appendKeyEnd(out);
   }
-  out += "</KEYBINDING>";
 }
 
 bool holdsInstance(const broker::Value& value) noexcept {
@@ -115,6 +115,16 @@ void appendValue(std::string& out, const broker::Value& value) {
   for (const broker::Scalar& element : value.elements) appendScalar(out, element, isReference);
   out += isReference ? "</VALUE.REFARRAY>" : "</VALUE.ARRAY>";
 }
+
+void appendKeyBegin(std::string& out, const broker::NamedValue& key) {
+  appendKeyBindingBegin(out, key);
+  out += "<KEYVALUE";
+  appendAttribute(out, "VALUETYPE", keyValueType(key.value.type));
+  appendAttribute(out, "TYPE", schema::typeName(key.value.type));
+  out += '>';
+}
+
+void appendKeyEnd(std::string& out) { out += "</KEYVALUE></KEYBINDING>"; }
 
 void appendInstanceName(std::string& out, const broker::ObjectPath& path) {
   out += "<INSTANCENAME";
@@ -198,41 +208,47 @@ void appendInstance(std::string& out, const broker::Instance& instance, const In
 }
 
 void InstanceWriter::append(std::string& out, const broker::Instance& instance) {
-  if (!fits(instance)) makeForm(instance);
+  const auto& [text, values] = formOf(instance);
   std::size_t done = 0;
-  for (std::size_t i = 0; i < values_.size(); ++i) {
+  for (std::size_t i = 0; i < values.size(); ++i) {
     const broker::Value& value = instance.properties[i].value;
     if (value.isNull) continue;
-    out.append(form_, done, values_[i].place - done);
-    done = values_[i].place;
+    out.append(text, done, values[i].place - done);
+    done = values[i].place;
     appendValue(out, value);
   }
-  out.append(form_, done);
+  out.append(text, done);
+}
+
+const InstanceWriter::Form& InstanceWriter::formOf(const broker::Instance& instance) {
+  if (!fits(instance)) makeForm(instance);
+  return form_;
 }
 
 bool InstanceWriter::fits(const broker::Instance& instance) const noexcept {
   if (declaration_ == nullptr || instance.declaration != declaration_) return false;
-  return std::equal(values_.begin(), values_.end(), instance.properties.begin(), instance.properties.end(),
-                    [](const ValuePlace& known, const broker::Property& property) {
+  return std::equal(form_.values.begin(), form_.values.end(), instance.properties.begin(), instance.properties.end(),
+                    [](const Form::ValuePlace& known, const broker::Property& property) {
                       return property.declaration == known.declaration && isAsDeclared(property);
                     });
 }
 
 void InstanceWriter::makeForm(const broker::Instance& instance) {
   declaration_ = instance.declaration;
-  values_.clear();
-  form_ = "<INSTANCE";
-  appendAttribute(form_, "CLASSNAME", instance.path.className);
-  form_ += '>';
+  form_.values.clear();
+  std::string& text = form_.text;
+  text = "<INSTANCE";
+  appendAttribute(text, "CLASSNAME", instance.path.className);
+  text += '>';
   if (detail_.qualifiers != nullptr && instance.declaration != nullptr) {
-    appendQualifiers(form_, instance.declaration->qualifiers(), false, *detail_.qualifiers);
+    appendQualifiers(text, instance.declaration->qualifiers(), false, *detail_.qualifiers);
   }
   for (const broker::Property& property : instance.properties) {
-    appendPropertyBegin(form_, property, instance, detail_);
-    values_.push_back({isAsDeclared(property) ? property.declaration : nullptr, form_.size()});
-    appendPropertyEnd(form_, property);
+    appendPropertyBegin(text, property, instance, detail_);
+    form_.values.push_back({isAsDeclared(property) ? property.declaration : nullptr, text.size()});
+    appendPropertyEnd(text, property);
   }
-  form_ += "</INSTANCE>";
+  text += "</INSTANCE>";
 }
 
 }  // namespace zorva::cimxml

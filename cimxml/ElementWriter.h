@@ -21,6 +21,10 @@ void appendValue(std::string& out, const broker::Value& value);
 /// INSTANCENAME with its KEYBINDINGs; host and namespace of the path are ignored.
 void appendInstanceName(std::string& out, const broker::ObjectPath& path);
 
+/// The text of a KEYBINDING around the value of a key that is no reference.
+void appendKeyBegin(std::string& out, const broker::NamedValue& key);
+void appendKeyEnd(std::string& out);
+
 /// LOCALNAMESPACEPATH: a NAMESPACE for each part between slashes.
 void appendLocalNamespacePath(std::string& out, std::string_view nameSpace);
 
@@ -59,20 +63,27 @@ class InstanceWriter {
 
   void append(std::string& out, const broker::Instance& instance);
 
- private:
-  /// The property is null if another instance could have another element there.
-  struct ValuePlace {
-    const schema::ClassProperty* declaration;
-    std::size_t place;  ///< in form_
+  /// An instance without values.
+  struct Form {
+    /// The property is null if another instance could have another element there.
+    struct ValuePlace {
+      const schema::ClassProperty* declaration;
+      std::size_t place;  ///< in text
+    };
+    std::string text;
+    std::vector<ValuePlace> values;
   };
 
+  /// That of `instance`; valid until the next instance.
+  const Form& formOf(const broker::Instance& instance);
+
+ private:
   bool fits(const broker::Instance& instance) const noexcept;
   void makeForm(const broker::Instance& instance);
 
   InstanceDetail detail_;
   const schema::Class* declaration_ = nullptr;
-  std::string form_;  ///< an instance without values
-  std::vector<ValuePlace> values_;
+  Form form_;
 };
 
 }  // namespace zorva::cimxml

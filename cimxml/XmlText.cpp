@@ -53,24 +53,43 @@ std::string_view standIn(char character) noexcept {
   }
 }
 
-/// How many bytes at the beginning of `text` are plain, tested in words of eight: most texts are plain.
-std::size_t plainWords(std::string_view text) noexcept {
-  using Word = std::uint64_t;
+using Word = std::uint64_t;
+
+template <typename Unsigned>
+Unsigned load(const char* bytes) noexcept {
+  Unsigned value = 0;
+  std::memcpy(&value, bytes, sizeof value);
+  return value;
+}
+
+/// Whether all eight bytes are plain.
+bool isPlainWord(Word word) noexcept {
   constexpr Word kOnes = 0x0101010101010101;
   constexpr Word kHighs = 0x8080808080808080;
   // Sets the high bit of each byte that is 0. Borrows may set others, but only in a word that has such a byte.
-  const auto zeros = [](Word word) { return (word - kOnes) & ~word; };
-  std::size_t done = 0;
-  for (; text.size() - done >= sizeof(Word); done += sizeof(Word)) {
-    Word word = 0;
-    std::memcpy(&word, text.data() + done, sizeof word);
-    const Word low = word - kOnes * 0x20;     // borrows from below 0x20
-    const Word high = word | (word + kOnes);  // 0x7F and above
-    const Word special =
-        zeros(word ^ kOnes * '&') | zeros(word ^ kOnes * '<') | zeros(word ^ kOnes * '>') | zeros(word ^ kOnes * '"');
-    if (((low | high | special) & kHighs) != 0) break;
+  const auto zeros = [](Word each) { return (each - kOnes) & ~each; };
+  const Word low = word - kOnes * 0x20;     // borrows from below 0x20
+  const Word high = word | (word + kOnes);  // 0x7F and above
+  const Word special =
+      zeros(word ^ kOnes * '&') | zeros(word ^ kOnes * '<') | zeros(word ^ kOnes * '>') | zeros(word ^ kOnes * '"');
+  return ((low | high | special) & kHighs) == 0;
+}
+
+/// How many bytes at the beginning of `text` are plain, tested in words of eight: most texts are plain. The last word
+/// may overlap the one before.
+std::size_t plainWords(std::string_view text) noexcept {
+  const std::size_t size = text.size();
+  const char* const bytes = text.data();
+  if (size < sizeof(std::uint32_t)) return 0;
+  if (size < sizeof(Word)) {
+    const auto end = load<std::uint32_t>(bytes + size - sizeof(std::uint32_t));
+    return isPlainWord(load<std::uint32_t>(bytes) | Word{end} << 32) ? size : 0;
   }
-  return done;
+  std::size_t done = 0;
+  for (; size - done >= sizeof(Word); done += sizeof(Word)) {
+    if (!isPlainWord(load<Word>(bytes + done))) return done;
+  }
+  return isPlainWord(load<Word>(bytes + size - sizeof(Word))) ? size : done;
 }
 
 template <typename Number>

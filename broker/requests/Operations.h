@@ -11,6 +11,9 @@
 
 namespace zorva::broker {
 
+struct InstanceObject;
+struct PropertyMask;
+
 /// What the providers get to know about the client, as entries of the CMPI context. Empty texts make no entry.
 struct Caller {
   std::string principal;
@@ -44,6 +47,8 @@ struct AssociationFilter {
 /// sink returns: copy what must be kept. False means that no more results are needed; the operation then ends as soon
 /// as the provider does.
 using InstanceSink = std::function<bool(const Instance& instance)>;
+/// The instance as its provider made it, without a copy in plain values, and which of its properties were requested.
+using ObjectSink = std::function<bool(const InstanceObject& object, const PropertyMask& wanted)>;
 using PathSink = std::function<bool(const ObjectPath& path)>;
 
 /// The result of a method.

@@ -1,0 +1,52 @@
+#pragma once
+
+// VALUE.NAMEDINSTANCE of instances as providers made them, without plain values between the two.
+
+#include <cstdint>
+#include <string>
+#include <vector>
+
+#include "broker/objects/Convert.h"
+#include "broker/objects/Objects.h"
+#include "cimxml/ElementWriter.h"
+
+namespace zorva::cimxml {
+
+/// Writes many instances. The text around the values is made once and used again while the instances have the same
+/// class and the same properties in the same order. Used by one thread at a time.
+class ObjectWriter {
+ public:
+  explicit ObjectWriter(const InstanceDetail& detail) : instances_(detail) {}
+
+  /// Appends an instance with its name. `wanted` is the same for all objects of a class.
+  void append(std::string& out, const broker::InstanceObject& object, const broker::PropertyMask& wanted);
+
+ private:
+  enum class Kind {
+    Key,    ///< the content of a KEYVALUE
+    Plain,  ///< the content of a VALUE, which the form has; left out with it if it is null
+    Other,  ///< everything that a value may be
+  };
+  struct Hole {
+    Kind kind;
+    std::uint32_t slot;  ///< of the object
+    std::size_t place;   ///< in text_
+  };
+
+  bool fits(const broker::InstanceObject& object, const broker::PropertyMask& wanted) const noexcept;
+  void makeForm(const broker::InstanceObject& object, const broker::PropertyMask& wanted);
+  void addName(const broker::InstanceObject& object);
+  void addProperties(const broker::InstanceObject& object, const broker::PropertyMask& wanted);
+  void fillForm(std::string& out, const broker::InstanceObject& object);
+
+  InstanceWriter instances_;
+  broker::Instance instance_;
+  broker::Value value_;
+  const broker::ClassInfo* info_ = nullptr;
+  const std::uint64_t* wanted_ = nullptr;
+  std::vector<const broker::PropertyInfo*> slots_;  ///< the properties that are set, in their order
+  std::string text_;
+  std::vector<Hole> holes_;  ///< the keys first
+};
+
+}  // namespace zorva::cimxml
