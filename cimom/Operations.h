@@ -13,6 +13,7 @@
 #include "access/Role.h"
 #include "broker/Broker.h"
 #include "cimom/Pull.h"
+#include "cimxml/ObjectWriter.h"
 #include "cimxml/RequestReader.h"
 #include "cimxml/ResponseWriter.h"
 #include "util/ServiceHost.h"
@@ -23,6 +24,7 @@ namespace zorva::cimom {
 struct Operation {
   broker::Broker& broker;
   PullTable& pulls;
+  cimxml::ObjectWriters& writers;
   const util::ServiceHost& host;
   const broker::Caller& caller;
   const cimxml::Call& call;

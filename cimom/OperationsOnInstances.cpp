@@ -8,7 +8,6 @@
 #include "cimom/OperationsArguments.h"
 #include "cimom/OperationsSelection.h"
 #include "cimxml/ElementWriter.h"
-#include "cimxml/ObjectWriter.h"
 #include "frontend/HostApply.h"
 #include "frontend/ReadBack.h"
 #include "util/Expected.h"
@@ -43,7 +42,9 @@ Status enumerateInstances(Operation& operation) {
   selection.deepInheritance = arguments.boolean("DeepInheritance", true);
   Status status = arguments.status();
   if (!status.ok()) return status;
-  cimxml::ObjectWriter writer(detailOf(operation, selection));
+  cimxml::ObjectWriters::Loan loan(operation.writers, className);
+  cimxml::ObjectWriter withDetail(detailOf(operation, selection));
+  cimxml::ObjectWriter& writer = selection.includeQualifiers || selection.includeClassOrigin ? withDetail : *loan;
   Stream stream(operation.writer);
   operation.writer.beginReturnValue();
   const auto write = [&](const broker::InstanceObject& object, const broker::PropertyMask& wanted) {

@@ -232,9 +232,9 @@ class ServiceCore {
     for (const cimxml::Call& call : request.calls) {
       writer.beginResponse(call.name, call.isExtrinsic);
       access::AuditRecord record = recordFor(client.http, call);
-      Operation operation{
-          broker_, pulls_, host_, client.caller, call, writer, client.http.client, client.http.who, client.headers.host,
-          {},      record};
+      Operation operation{broker_, pulls_, writers_,           host_,           client.caller,
+                          call,    writer, client.http.client, client.http.who, client.headers.host,
+                          {},      record};
       const Status status = carryOutSafely(operation);
       audit(std::move(record), status);
       if (options_.operationEnded) options_.operationEnded(call.name, static_cast<int>(status.rc));
@@ -273,6 +273,7 @@ class ServiceCore {
   const ServiceOptions options_;
   const util::ServiceHost host_;
   PullTable pulls_;
+  cimxml::ObjectWriters writers_;
   std::binary_semaphore largeReads_{1};
 };
 

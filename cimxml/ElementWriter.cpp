@@ -234,7 +234,7 @@ bool InstanceWriter::fits(const broker::Instance& instance) const noexcept {
 }
 
 void InstanceWriter::makeForm(const broker::Instance& instance) {
-  declaration_ = instance.declaration;
+  declaration_ = nullptr;  // until the form is complete
   form_.values.clear();
   std::string& text = form_.text;
   text = "<INSTANCE";
@@ -249,6 +249,7 @@ void InstanceWriter::makeForm(const broker::Instance& instance) {
     appendPropertyEnd(text, property);
   }
   text += "</INSTANCE>";
+  declaration_ = instance.declaration;
 }
 
 }  // namespace zorva::cimxml

@@ -5,6 +5,7 @@
 
 #include "broker/objects/Numbers.h"
 #include "cimxml/XmlText.h"
+#include "util/Names.h"
 
 namespace zorva::cimxml {
 
@@ -84,7 +85,7 @@ bool ObjectWriter::fits(const InstanceObject& object, const broker::PropertyMask
 }
 
 void ObjectWriter::makeForm(const InstanceObject& object, const broker::PropertyMask& wanted) {
-  info_ = object.info;
+  info_ = nullptr;  // until the form is complete
   wanted_ = wanted.bits;
   slots_.clear();
   for (std::uint32_t i = 0; i < object.count; ++i) slots_.push_back(object.slots[i].property);
@@ -93,6 +94,7 @@ void ObjectWriter::makeForm(const InstanceObject& object, const broker::Property
   addName(object);
   addProperties(object, wanted);
   text_ += "</VALUE.NAMEDINSTANCE>";
+  info_ = object.info;
 }
 
 void ObjectWriter::addName(const InstanceObject& object) {
@@ -147,6 +149,24 @@ void ObjectWriter::fillForm(std::string& out, const InstanceObject& object) {
     }
   }
   out.append(text_, done);
+}
+
+std::unique_ptr<ObjectWriters::Entry> ObjectWriters::take(std::string_view className) {
+  const std::lock_guard lock(mutex_);
+  const auto known = std::find_if(idle_.begin(), idle_.end(),
+                                  [&](const auto& entry) { return util::sameName(entry->className, className); });
+  if (known == idle_.end()) return std::make_unique<Entry>(Entry{std::string(className)});
+  std::unique_ptr<Entry> entry = std::move(*known);
+  idle_.erase(known);
+  entry->writer.beginRequest();
+  return entry;
+}
+
+/// The one that was not used for longest makes room.
+void ObjectWriters::giveBack(std::unique_ptr<Entry> entry) noexcept {
+  const std::lock_guard lock(mutex_);
+  if (idle_.size() == kMost) idle_.erase(idle_.begin());
+  idle_.push_back(std::move(entry));
 }
 
 }  // namespace zorva::cimxml

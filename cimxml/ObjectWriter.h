@@ -3,12 +3,17 @@
 // VALUE.NAMEDINSTANCE of instances as providers made them, without plain values between the two.
 
 #include <cstdint>
+#include <memory>
+#include <mutex>
 #include <string>
+#include <string_view>
+#include <utility>
 #include <vector>
 
 #include "broker/objects/Convert.h"
 #include "broker/objects/Objects.h"
 #include "cimxml/ElementWriter.h"
+#include "util/NotCopied.h"
 
 namespace zorva::cimxml {
 
@@ -20,6 +25,12 @@ class ObjectWriter {
 
   /// Appends an instance with its name. `wanted` is the same for all objects of a class.
   void append(std::string& out, const broker::InstanceObject& object, const broker::PropertyMask& wanted);
+
+  /// Objects of a new request may come with other masks. A form of all properties stays good for as long as the classes
+  /// do.
+  void beginRequest() noexcept {
+    if (wanted_ != nullptr) info_ = nullptr;
+  }
 
  private:
   enum class Kind {
@@ -47,6 +58,39 @@ class ObjectWriter {
   std::vector<const broker::PropertyInfo*> slots_;  ///< the properties that are set, in their order
   std::string text_;
   std::vector<Hole> holes_;  ///< the keys first
+};
+
+/// Writers without details that nobody uses now, with the forms that they made: to make one costs as much as to write a
+/// dozen instances. Thread-safe. It lives no longer than the classes.
+class ObjectWriters : util::NotCopied {
+  struct Entry {
+    std::string className;  ///< that it was used for
+    ObjectWriter writer{InstanceDetail()};
+  };
+
+ public:
+  ObjectWriters() { idle_.reserve(kMost); }
+
+  /// A writer that goes back when this ends.
+  class Loan : util::NotCopied {
+   public:
+    Loan(ObjectWriters& from, std::string_view className) : from_(from), lent_(from.take(className)) {}
+    ~Loan() { from_.giveBack(std::move(lent_)); }
+    ObjectWriter& operator*() noexcept { return lent_->writer; }
+
+   private:
+    ObjectWriters& from_;
+    std::unique_ptr<Entry> lent_;
+  };
+
+ private:
+  static constexpr std::size_t kMost = 16;
+
+  std::unique_ptr<Entry> take(std::string_view className);
+  void giveBack(std::unique_ptr<Entry> entry) noexcept;
+
+  std::mutex mutex_;
+  std::vector<std::unique_ptr<Entry>> idle_;
 };
 
 }  // namespace zorva::cimxml

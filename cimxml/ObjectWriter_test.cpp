@@ -144,5 +144,34 @@ TEST_F(XmlObject, AppendsToWhatIsThere) {
   EXPECT_EQ(out, "before" + element + element);
 }
 
+TEST_F(XmlObject, IsTheSameFromAWriterThatWasUsedBefore) {
+  ObjectWriters writers;
+  const std::uint64_t bits = 0b101'0101'1011;
+  std::uint64_t mask = 0;  // each request's mask may lie where the last one's lay
+  for (const std::uint64_t wanted : {std::uint64_t{0}, bits, ~bits, std::uint64_t{0}}) {
+    mask = wanted;
+    for (const InstanceObject* object : all()) {
+      const PropertyMask used = mask == 0 ? PropertyMask() : PropertyMask{&mask};
+      ObjectWriters::Loan loan(writers, "A");
+      ObjectWriters::Loan beside(writers, "a");
+      EXPECT_NE(&*loan, &*beside);
+      std::string out;
+      (*loan).append(out, *object, used);
+      EXPECT_EQ(out, byPlainValues(*object, used, {}));
+    }
+  }
+}
+
+TEST_F(XmlObject, FewWritersAreKept) {
+  ObjectWriters writers;
+  const InstanceObject& one = object(endpoint("A", "eth0", {{"Text", Value::text("1")}}));
+  for (int i = 0; i < 100; ++i) {
+    ObjectWriters::Loan loan(writers, "Class" + std::to_string(i));
+    std::string out;
+    (*loan).append(out, one, {});
+    EXPECT_EQ(out, byPlainValues(one, {}, {}));
+  }
+}
+
 }  // namespace
 }  // namespace zorva::cimxml
