@@ -189,11 +189,11 @@ inline void logVariable(const std::string& logger, const LogSite& site, const ch
 }
 
 /// One label or value of a parameter list: text unchanged, a bool as the stream prints it, anything else as its
-/// address. The stream prints a bool as one digit, in each locale.
+/// address.
 template <typename T>
 void appendParameter(ZALog::ZAMessageBuffer& buffer, const T& labelOrValue) {
   if constexpr (std::is_same_v<T, bool>) {
-    buffer << (labelOrValue ? "1" : "0");
+    static_cast<std::ostream&>(buffer) << labelOrValue;
   } else if constexpr (std::is_convertible_v<T, const char*>) {
     buffer << static_cast<const char*>(labelOrValue);
   } else {

@@ -3,9 +3,9 @@
 #include <algorithm>
 #include <iterator>
 #include <memory>
+#include <nlohmann/json.hpp>
 #include <utility>
 
-#include "agent/tree/PlainJson.h"
 #include "util/ReadFile.h"
 #include "util/Utf8.h"
 
@@ -76,9 +76,8 @@ class LineCounter {
   bool afterLineFeed_ = false;
 };
 
-// Builds the value while a parser runs. The plain reader relies on the limit of the depth: it needs stack for each
-// level.
-class Builder final : public JsonEvents {
+// Builds the value while the parser runs. The parser itself needs no stack for nested values.
+class Builder final : public nlohmann::json_sax<nlohmann::json> {
  public:
   /// The line is that of the current event.
   Builder(const std::string& name, const int& line, std::size_t mostValues)
@@ -279,11 +278,6 @@ const JsonValue* JsonValue::find(std::string_view key) const {
 
 JsonValue parseJson(const std::string& text, const std::string& name, std::size_t mostValues) {
   if (text.size() > kLargestJson) throw ConfigError(name, 0, {}, "is larger than 64 MiB");
-  {
-    int line = 1;
-    Builder builder(name, line, mostValues);
-    if (readPlainJson(text, line, builder)) return builder.take();
-  }
   int line = 1;
   Builder builder(name, line, mostValues);
   nlohmann::json::sax_parse(LineCounter(text.data(), line), LineCounter(text.data() + text.size(), line), &builder);
