@@ -160,7 +160,10 @@ ZAMessageBuffer& ZAMessageBuffer::appendAddress(const void* address) {
   auto rest = reinterpret_cast<std::uintptr_t>(address);
   for (; rest > 0xF; rest >>= 8) std::memcpy(begin -= 2, &kHexPairs[2 * (rest & 0xFF)], 2);
   if (rest != 0 || address == nullptr) *--begin = kHexPairs[2 * rest + 1];
-  if (address != nullptr) std::memcpy(begin -= 2, "0x", 2);
+  if (address != nullptr) {
+    *--begin = 'x';
+    *--begin = '0';
+  }
   room_->text.append(begin, static_cast<std::size_t>(std::end(text) - begin));
   return *this;
 }
