@@ -47,7 +47,7 @@ bool isPlainKey(const InstanceObject::Slot* slot) noexcept {
 }
 
 /// Whether all instances with the same properties in the same order differ in nothing but their values.
-bool hasForm(const InstanceObject& object) {
+bool isOfAForm(const InstanceObject& object) {
   const auto& keys = object.info->keys();
   return object.looseKeys == nullptr &&
          std::all_of(object.slots, object.slots + object.count,
@@ -60,7 +60,7 @@ bool hasForm(const InstanceObject& object) {
 void ObjectWriter::append(std::string& out, const InstanceObject& object, const broker::PropertyMask& wanted) {
   if (!fits(object, wanted)) {
     fillInstance(object, wanted, instance_);
-    if (!hasForm(object)) {
+    if (!isOfAForm(object)) {
       out += "<VALUE.NAMEDINSTANCE>";
       appendInstanceName(out, instance_.path);
       instances_.append(out, instance_);
@@ -162,8 +162,15 @@ std::unique_ptr<ObjectWriters::Entry> ObjectWriters::take(std::string_view class
   return entry;
 }
 
-/// The one that was not used for longest makes room.
+std::size_t ObjectWriters::size() const {
+  const std::lock_guard lock(mutex_);
+  return idle_.size();
+}
+
+/// The one that was not used for longest makes room. A name of which nothing was written may be anything that a client
+/// sent, of any length: it is not kept.
 void ObjectWriters::giveBack(std::unique_ptr<Entry> entry) noexcept {
+  if (!entry->writer.hasForm()) return;
   const std::lock_guard lock(mutex_);
   if (idle_.size() == kMost) idle_.erase(idle_.begin());
   idle_.push_back(std::move(entry));

@@ -32,6 +32,9 @@ class ObjectWriter {
     if (wanted_ != nullptr) info_ = nullptr;
   }
 
+  /// Whether there is a form that the next instance may fit.
+  bool hasForm() const noexcept { return info_ != nullptr; }
+
  private:
   enum class Kind {
     Key,    ///< the content of a KEYVALUE
@@ -69,7 +72,13 @@ class ObjectWriters : util::NotCopied {
   };
 
  public:
+  /// More are not kept.
+  static constexpr std::size_t kMost = 16;
+
   ObjectWriters() { idle_.reserve(kMost); }
+
+  /// How many are kept now.
+  std::size_t size() const;
 
   /// A writer that goes back when this ends.
   class Loan : util::NotCopied {
@@ -84,12 +93,10 @@ class ObjectWriters : util::NotCopied {
   };
 
  private:
-  static constexpr std::size_t kMost = 16;
-
   std::unique_ptr<Entry> take(std::string_view className);
   void giveBack(std::unique_ptr<Entry> entry) noexcept;
 
-  std::mutex mutex_;
+  mutable std::mutex mutex_;
   std::vector<std::unique_ptr<Entry>> idle_;
 };
 

@@ -171,6 +171,13 @@ TEST_F(XmlObject, FewWritersAreKept) {
     (*loan).append(out, one, {});
     EXPECT_EQ(out, byPlainValues(one, {}, {}));
   }
+  EXPECT_EQ(writers.size(), ObjectWriters::kMost);
+}
+
+TEST_F(XmlObject, AWriterOfAClassWithoutInstancesIsNotKept) {
+  ObjectWriters writers;
+  { const ObjectWriters::Loan loan(writers, std::string(1000, 'x')); }
+  EXPECT_EQ(writers.size(), 0U);
 }
 
 }  // namespace
