@@ -11,6 +11,13 @@
 
 namespace zorva::agent::testing {
 
+/// The words of a command.
+inline std::vector<std::string> commandOf(const std::string& program, const std::vector<std::string>& arguments) {
+  std::vector<std::string> words{program};
+  words.insert(words.end(), arguments.begin(), arguments.end());
+  return words;
+}
+
 /// A program with its arguments and its environment, to be executed in a child process. Everything is made before
 /// fork(): a child that was forked beside other threads must not allocate, because the sanitizers' allocator may stay
 /// locked in it for ever.

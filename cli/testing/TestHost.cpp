@@ -24,6 +24,7 @@ namespace zorva::cli {
 
 namespace {
 
+using agent::testing::commandOf;
 using agent::testing::Program;
 
 struct Pair {
@@ -80,12 +81,6 @@ int exitCodeOf(pid_t child) {
   int status = 0;
   ::waitpid(child, &status, 0);
   return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
-}
-
-std::vector<std::string> zorvactlWith(const std::vector<std::string>& words) {
-  std::vector<std::string> all{ZORVA_BIN_DIR "/zorvactl"};
-  all.insert(all.end(), words.begin(), words.end());
-  return all;
 }
 
 }  // namespace
@@ -183,7 +178,8 @@ Outcome TestHost::runWithInput(const std::string& input, const std::vector<std::
 
 Outcome TestHost::runAtTerminal(const std::vector<std::string>& words, const std::vector<std::string>& questions,
                                 const std::vector<std::string>& answers) const {
-  const Program zorvactl(zorvactlWith(words), {{"ZORVAGENT_CONFIG", directory_ / "agent.toml"}, {"TERM", "dumb"}});
+  const Program zorvactl(commandOf(ZORVA_BIN_DIR "/zorvactl", words),
+                         {{"ZORVAGENT_CONFIG", directory_ / "agent.toml"}, {"TERM", "dumb"}});
   int master = -1;
   const pid_t child = ::forkpty(&master, nullptr, nullptr, nullptr);
   if (child < 0) throw std::runtime_error("no terminal");
@@ -207,7 +203,7 @@ Outcome TestHost::runPrepared(const std::function<bool()>& prepare, const Enviro
   Environment variables = environment;
   variables.emplace_back("ZORVAGENT_CONFIG", directory_ / "agent.toml");
   variables.emplace_back("TERM", "xterm");
-  const Program zorvactl(zorvactlWith(words), variables);
+  const Program zorvactl(commandOf(ZORVA_BIN_DIR "/zorvactl", words), variables);
   const Pair out = makeOutput(output);
   const Pair err = output == OutputTo::ErrorTerminal ? makeTerminal() : makePipe();
   const pid_t child = ::fork();

@@ -19,6 +19,7 @@ namespace zorva::server::testing {
 namespace {
 
 using Clock = std::chrono::steady_clock;
+using zorva::agent::testing::commandOf;
 using zorva::agent::testing::contentsOf;
 using zorva::agent::testing::Program;
 
@@ -28,12 +29,6 @@ constexpr const char* kTree = R"({"system_name":"host1","nodes":[
       {"type":"NetworkIPConfig","name":"ip","description":"","properties":{
         "name":"eth0","host_name":"host1","domain_name":"example.org","dns_suffixes":["example.org"],
         "dns_server_addresses":["192.0.2.53"],"protocol_if_type":4097,"enabled_state":1}}]}]}]})";
-
-std::vector<std::string> zorvacimdWith(const std::vector<std::string>& arguments) {
-  std::vector<std::string> all{ZORVA_BIN_DIR "/zorvacimd"};
-  all.insert(all.end(), arguments.begin(), arguments.end());
-  return all;
-}
 
 int exitCodeOf(int status) { return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status); }
 
@@ -77,7 +72,7 @@ TestDaemon::TestDaemon(const std::string& config, std::vector<std::string> argum
   util::FileDescriptor out(ends[1]);
   const util::FileDescriptor err(
       ::open((directory_ / "stderr").c_str(), O_WRONLY | O_CREAT | O_APPEND | O_CLOEXEC, 0600));
-  const Program zorvacimd(zorvacimdWith(arguments));
+  const Program zorvacimd(commandOf(ZORVA_BIN_DIR "/zorvacimd", arguments));
   process_ = ::fork();
   if (process_ == 0) {
     if (prepare) prepare();
@@ -136,7 +131,7 @@ DaemonOutcome TestDaemon::run(const std::vector<std::string>& arguments) {
   const zorva::agent::testing::TemporaryDirectory directory;
   const util::FileDescriptor out(::open((directory / "out").c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600));
   const util::FileDescriptor err(::open((directory / "err").c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600));
-  const Program zorvacimd(zorvacimdWith(arguments));
+  const Program zorvacimd(commandOf(ZORVA_BIN_DIR "/zorvacimd", arguments));
   const pid_t process = ::fork();
   if (process == 0) zorvacimd.exec(out.get(), err.get());
   int status = 0;
