@@ -99,6 +99,10 @@ std::string interfaceOfId(std::string_view instanceId) {
   return percent == std::string_view::npos ? std::string() : std::string(instanceId.substr(percent + 1));
 }
 
+std::string settingIdOf(std::string_view interface, bool isServiceProcessor) {
+  return std::string(isServiceProcessor ? "BMC%" : "Computer%").append(interface);
+}
+
 std::optional<std::string> interfaceOfHostSettings(const zorva::agent::TreeSnapshot& tree) {
   for (const zorva::agent::Node& node : tree.nodes()) {
     if (node.type() != zorva::agent::NodeType::NetworkIPConfig) continue;

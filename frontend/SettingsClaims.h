@@ -47,6 +47,9 @@ class SettingsClaims {
 /// The interface in an InstanceID of an interface's settings: the text after the first "%".
 std::string interfaceOfId(std::string_view instanceId);
 
+/// The InstanceID of an interface's settings: "Computer%eth0", of a service processor "BMC%eth0".
+std::string settingIdOf(std::string_view interface, bool isServiceProcessor);
+
 /// The interface whose file has the settings of the host as a whole: that of the first configuration outside a service
 /// processor. Nothing if there is none; the empty text if that one has no name.
 std::optional<std::string> interfaceOfHostSettings(const zorva::agent::TreeSnapshot& tree);

@@ -111,19 +111,17 @@ std::map<std::string, StringList> serversOfSettings(const CMPIBroker* broker, co
 Questions questionsFor(const TreeSnapshot& tree, const std::map<std::string, StringList>& serversById) {
   Questions questions;
   Limits limits;
-  const Node* host = nullptr;
   for (const Node& node : tree.nodes()) {
-    const bool isServiceProcessor = tree.systemOf(node).isServiceProcessor();
-    if (host == nullptr && node.type() == agent::NodeType::System && !isServiceProcessor) host = &node;
     const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
     if (node.type() != agent::NodeType::NetworkIPConfig || name == nullptr) continue;
-    const auto found = serversById.find((isServiceProcessor ? "BMC%" : "Computer%") + *name);
+    const auto found = serversById.find(frontend::settingIdOf(*name, tree.systemOf(node).isServiceProcessor()));
     const StringList servers = found == serversById.end() ? StringList() : found->second;
     questions.askers.push_back(limits.cut({*name,
                                            dns::withPorts(servers, node.listOrEmpty(agent::kDnsServersInFull)),
                                            {},
                                            node.listOrEmpty(ZV::NodeLexicon::PROP_DNS_SUFFIXES)}));
   }
+  const Node* host = tree.ownSystem();
   if (host == nullptr) return questions;
   questions.hostServers = host->listOrEmpty(agent::kResolverServers);
   questions.askers.push_back(limits.cut({kHost, questions.hostServers, host->listOrEmpty(agent::kResolverNotAsked),

@@ -62,7 +62,7 @@ void addOwner(HostObject& origin, const Node& node) {
 
 HostObject originOfInterface(const Node& node, const std::string& name, bool isServiceProcessor,
                              const agent::SettingFiles& files) {
-  HostObject origin = originOf((isServiceProcessor ? "BMC%" : "Computer%") + name, name, files);
+  HostObject origin = originOf(frontend::settingIdOf(name, isServiceProcessor), name, files);
   addOwner(origin, node);
   const agent::StringList set = setProperties(node);
   addList(origin, "SetProperties", &set);
@@ -72,14 +72,12 @@ HostObject originOfInterface(const Node& node, const std::string& name, bool isS
 HostObject originOfHost(const agent::TreeSnapshot& tree, const agent::SettingFiles& files) {
   HostObject origin =
       originOf("dnsgen1:" + ZV::getSystemName(), frontend::interfaceOfHostSettings(tree).value_or(""), files);
-  for (const Node& node : tree.nodes()) {
-    if (node.type() != agent::NodeType::System || node.isServiceProcessor()) continue;
-    addOwner(origin, node);
-    addList(origin, "ResolverServers", node.list(agent::kResolverServers));
-    addList(origin, "ResolverServersNotAsked", node.list(agent::kResolverNotAsked));
-    addList(origin, "ResolverSearch", node.list(agent::kResolverSearch));
-    break;
-  }
+  const Node* system = tree.ownSystem();
+  if (system == nullptr) return origin;
+  addOwner(origin, *system);
+  addList(origin, "ResolverServers", system->list(agent::kResolverServers));
+  addList(origin, "ResolverServersNotAsked", system->list(agent::kResolverNotAsked));
+  addList(origin, "ResolverSearch", system->list(agent::kResolverSearch));
   return origin;
 }
 

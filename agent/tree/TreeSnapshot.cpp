@@ -26,6 +26,12 @@ const Node* TreeSnapshot::nextOfType(NodeType type, std::size_t from) const {
   return nullptr;
 }
 
+const Node* TreeSnapshot::ownSystem() const {
+  const Node* node = nextOfType(NodeType::System, 0);
+  while (node != nullptr && node->isServiceProcessor()) node = nextOfType(NodeType::System, node->index() + 1);
+  return node;
+}
+
 TreeBuilder::TreeBuilder(std::string systemName) : tree_(new TreeSnapshot) {
   tree_->systemName_ = std::move(systemName);
   tree_->nodes_.emplace_back().path_ = "/";

@@ -31,6 +31,9 @@ class ZORVA_AGENT_API TreeSnapshot {
   /// The parent of a node of this snapshot; the root is its own.
   const Node& parent(const Node& node) const { return nodes_[node.parentIndex()]; }
 
+  /// The first system that is no service processor: this host itself. Null if there is none.
+  const Node* ownSystem() const;
+
   /// The system that an interface, a node of type NetworkIPConfig, belongs to.
   const Node& systemOf(const Node& interface) const { return parent(parent(interface)); }
 

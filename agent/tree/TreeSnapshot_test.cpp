@@ -84,6 +84,19 @@ TEST_F(SmallTree, NodesOfATypeAreFoundOneAfterTheOther) {
   EXPECT_EQ(tree_->nextOfType(NodeType::NetworkIPConfig, second->index() + 1), nullptr);
 }
 
+TEST(TreeSnapshot, TheOwnSystemIsTheFirstThatIsNoServiceProcessor) {
+  TreeBuilder alone("host1");
+  alone.add(0, NodeType::System, "bmc", "BMC");
+  EXPECT_EQ(alone.finish()->ownSystem(), nullptr);
+  TreeBuilder builder("host1");
+  builder.add(0, NodeType::System, "bmc", "BMC");
+  builder.add(0, NodeType::System, "system", "Computer");
+  builder.add(0, NodeType::System, "other", "Computer");
+  const auto tree = builder.finish();
+  ASSERT_NE(tree->ownSystem(), nullptr);
+  EXPECT_EQ(tree->ownSystem()->path(), "/system");
+}
+
 TEST_F(SmallTree, OnlyASystemThatIsCalledBmcIsAServiceProcessor) {
   EXPECT_TRUE(tree_->find("/bmc")->isServiceProcessor());
   EXPECT_FALSE(tree_->find("/system")->isServiceProcessor());

@@ -262,18 +262,15 @@ void readInterfaces(Session& session, HostView& view, const LocalFacts* local) {
 /// What the node of the host's system says.
 void readSystemNode(const zorva::agent::TreeSnapshot& tree, HostRow& host) {
   using namespace zorva::agent;
-  for (const Node* node = tree.nextOfType(NodeType::System, 0); node != nullptr;
-       node = tree.nextOfType(NodeType::System, node->index() + 1)) {
-    if (node->isServiceProcessor()) continue;
-    host.facts = ownerFacts(*node);
-    host.servers = node->listOrEmpty(ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES);
-    host.ownSuffixes = node->listOrEmpty(ZV::NodeLexicon::PROP_DNS_SUFFIXES);
-    host.resolverServers = node->listOrEmpty(kResolverServers);
-    host.resolverNotAsked = node->listOrEmpty(kResolverNotAsked);
-    host.resolverSearch = node->listOrEmpty(kResolverSearch);
-    host.resolverOptions = node->listOrEmpty(kResolverOptions);
-    return;
-  }
+  const Node* node = tree.ownSystem();
+  if (node == nullptr) return;
+  host.facts = ownerFacts(*node);
+  host.servers = node->listOrEmpty(ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES);
+  host.ownSuffixes = node->listOrEmpty(ZV::NodeLexicon::PROP_DNS_SUFFIXES);
+  host.resolverServers = node->listOrEmpty(kResolverServers);
+  host.resolverNotAsked = node->listOrEmpty(kResolverNotAsked);
+  host.resolverSearch = node->listOrEmpty(kResolverSearch);
+  host.resolverOptions = node->listOrEmpty(kResolverOptions);
 }
 
 std::optional<BmcReading> readingOfBmc(const zorva::agent::TreeSnapshot& tree) {
