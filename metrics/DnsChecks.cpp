@@ -56,10 +56,8 @@ Round askAll(const std::vector<std::string>& servers) {
 std::vector<std::string> serversToAsk(const agent::TreeSnapshot& tree) {
   std::vector<std::string> result;
   std::set<std::string> seen;
+  if (const Node* own = tree.ownSystem()) addServers(own->listOrEmpty(agent::kResolverServers), seen, result);
   for (const Node& node : tree.nodes()) {
-    if (node.type() == agent::NodeType::System && !node.isServiceProcessor()) {
-      addServers(node.listOrEmpty(agent::kResolverServers), seen, result);
-    }
     if (node.type() != agent::NodeType::NetworkIPConfig || tree.systemOf(node).isServiceProcessor()) continue;
     const StringList& servers = node.listOrEmpty(ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES);
     addServers(dns::withPorts(servers, node.listOrEmpty(agent::kDnsServersInFull)), seen, result);
