@@ -113,10 +113,10 @@ int main(int argc, char** argv) {
   sockaddr_in address{};
   address.sin_family = AF_INET;
   address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-  MHD_Daemon* daemon = MHD_start_daemon(                                                //
-      MHD_USE_EPOLL_INTERNAL_THREAD | MHD_ALLOW_SUSPEND_RESUME | MHD_USE_ERROR_LOG, 0,  //
-      nullptr, nullptr, &onRequest, &server,                                            //
-      MHD_OPTION_SOCK_ADDR, reinterpret_cast<sockaddr*>(&address),                      //
+  MHD_Daemon* daemon = MHD_start_daemon(                            //
+      MHD_USE_EPOLL_INTERNAL_THREAD | MHD_ALLOW_SUSPEND_RESUME, 0,  //
+      nullptr, nullptr, &onRequest, &server,                        //
+      MHD_OPTION_SOCK_ADDR, reinterpret_cast<sockaddr*>(&address),  //
       MHD_OPTION_THREAD_POOL_SIZE, static_cast<unsigned>(threads), MHD_OPTION_END);
   if (daemon == nullptr) return 1;
   std::printf("%u\n", MHD_get_daemon_info(daemon, MHD_DAEMON_INFO_BIND_PORT)->port);

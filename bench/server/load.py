@@ -9,8 +9,9 @@ back. A second ratio is to a ceiling whose event threads answer by themselves. A
 hanging provider would block all connections of its thread. wrk measures all of them in turns, and the best turn of each
 counts, because other work on the machine only lowers a figure. Each request asks for all properties.
 
-"cpu" is the processor time of one request for 3 and for 1,000 endpoints, and how it grows from one connection to eight. With
---before BUILD it is compared with that of another build, measured in turns with this one.
+"cpu" is the processor time of one request for 3 and for 1,000 endpoints, how it grows from one connection to eight, and how
+many times that of the ceiling it is. With --before BUILD it is compared with that of another build, measured in turns with
+this one.
 
 "stream" is how soon the first byte of 10,000 instances arrives, and the memory that they take.
 
@@ -44,6 +45,8 @@ HERE = os.path.dirname(os.path.abspath(__file__))
 THREADS = 2
 TURNS = 8
 SECONDS = 1
+# Of the processor time of a request for so many endpoints, to that of the ceiling's.
+CPU_LIMITS = {3: 5, 1000: 14}
 
 
 @dataclasses.dataclass
@@ -99,14 +102,14 @@ def server(build, program, interfaces=None):
 
 @contextlib.contextmanager
 def ceiling(build, body, way="handover"):
-    """Serves the bytes from memory, with a hand-over between threads or directly; gives the port."""
+    """Serves the bytes from memory, with a hand-over between threads or directly; gives its process and port."""
     with tempfile.NamedTemporaryFile() as file:
         file.write(body)
         file.flush()
         process = subprocess.Popen([os.path.join(build, "bin", "server_ceiling"), file.name, str(THREADS), way],
                                    stdin=subprocess.PIPE, stdout=subprocess.PIPE, text=True)
         try:
-            yield int(process.stdout.readline())
+            yield process, int(process.stdout.readline())
         finally:
             process.stdin.close()
             process.wait(timeout=30)
@@ -151,8 +154,8 @@ def throughput(build, class_name, limit, tail_limit):
     with contextlib.ExitStack() as stack:
         _, port = stack.enter_context(server(build, "server_bench"))
         body = ask(port, class_name)
-        best = stack.enter_context(ceiling(build, body))
-        direct = stack.enter_context(ceiling(build, body, "direct"))
+        _, best = stack.enter_context(ceiling(build, body))
+        _, direct = stack.enter_context(ceiling(build, body, "direct"))
         count = {"Bench_Few": "4 instances", "Bench_Many": "1,000 instances"}[class_name]
         for connections in (1, 8):
             runs, best_runs, direct_runs = [], [], []
@@ -180,7 +183,7 @@ def endpoints(build):
     figures = []
     class_name = "ZORVA_DNSProtocolEndPoint"
     for interfaces, what in ((None, "this host"), (1000, "1,000 interfaces")):
-        with server(build, "zorvacimd", interfaces) as (process, port), ceiling(build, ask(port, class_name)) as best:
+        with server(build, "zorvacimd", interfaces) as (process, port), ceiling(build, ask(port, class_name)) as (_, best):
             before = threads_time(process.pid)
             rate, half, most = load(port, class_name, 1, 3)
             after = threads_time(process.pid)
@@ -202,15 +205,18 @@ def processor_time(process):
 
 
 def cpu_of_requests(build, before, interfaces):
-    """Processor time per request of real endpoints, at one connection and at eight, and that of the build before."""
+    """Processor time per request of real endpoints, at one connection and at eight, beside that of a server which sends
+    the same bytes from memory, and beside that of the build before."""
     builds = [build] + ([before] if before else [])
     class_name = "ZORVA_DNSProtocolEndPoint"
     times = {}
     tails = []
     with contextlib.ExitStack() as stack:
-        servers = [stack.enter_context(server(each, "zorvacimd", interfaces)) for each in builds]
+        servers = {each: stack.enter_context(server(each, "zorvacimd", interfaces)) for each in builds}
+        body = ask(servers[build][1], class_name)
+        servers["ceiling"] = stack.enter_context(ceiling(build, body))
         for _ in range(TURNS):
-            for each, (process, port) in zip(builds, servers):
+            for each, (process, port) in servers.items():
                 for connections in (1, 8):
                     start = processor_time(process.pid)
                     rate, half, most = load(port, class_name, connections, 2)
@@ -222,10 +228,12 @@ def cpu_of_requests(build, before, interfaces):
     figures = [Figure(f"{name}: CPU per request, 8 connections to 1", least[build, 8] / least[build, 1], 1.15, False,
                       f"{least[build, 8]:.0f} / {least[build, 1]:.0f} us"),
                Figure(f"{name}: p99, to p50", min(tails), 3, False, f"{statistics.median(tails):.1f} in the median turn")]
-    if before:
-        figures += [Figure(f"{name}, {connections} connections: CPU per request, to the build before",
-                           least[build, connections] / least[before, connections], 1, False,
-                           f"{least[build, connections]:.0f} / {least[before, connections]:.0f} us")
+    for other, what, limit in (("ceiling", "the ceiling's", CPU_LIMITS[interfaces]), (before, "that of the build before", 1)):
+        if other is None:
+            continue
+        figures += [Figure(f"{name}, {connections} connection{'s' if connections > 1 else ''}: CPU per request, to {what}",
+                           least[build, connections] / least[other, connections], limit, False,
+                           f"{least[build, connections]:.0f} / {least[other, connections]:.0f} us")
                     for connections in (1, 8)]
     return figures
 
@@ -266,7 +274,8 @@ def threads_time(process):
 
 @contextlib.contextmanager
 def secure_server(build):
-    """Runs zorvacimd with a certificate and a user; gives its ports of HTTP and of HTTPS, and the user's login."""
+    """Runs zorvacimd with a certificate and a user; gives its process, its ports of HTTP and of HTTPS, and the user's
+    login."""
     with tempfile.TemporaryDirectory() as directory:
         config = os.path.join(directory, "zorvacimd.toml")
         with open(config, "w", encoding="utf-8") as file:
@@ -282,7 +291,7 @@ def secure_server(build):
         try:
             line = process.stdout.readline()
             ports = {scheme: int(port) for scheme, port in re.findall(r"(https?)://127\.0\.0\.1:(\d+)", line)}
-            yield ports["http"], ports["https"], intruders.basic("bench", "bench secret")
+            yield process, ports["http"], ports["https"], intruders.basic("bench", "bench secret")
         finally:
             process.terminate()
             process.wait(timeout=30)
@@ -291,21 +300,27 @@ def secure_server(build):
 def tls(build):
     figures = []
     class_name = "ZORVA_DNSProtocolEndPoint"
-    with secure_server(build) as (http_port, https_port, login):
+    with secure_server(build) as (process, http_port, https_port, login):
         ways = {"plain": (http_port, "http", None), "tls": (https_port, "https", None), "login": (https_port, "https", login)}
         for connections in (1, 8):
             # What comes first in a turn changes, and each ratio is of neighbours in time: the machine is not equally fast all the time.
             turns = []
+            spent = {way: [] for way in ways}
             for turn in range(2 * TURNS):
-                order = list(ways) if turn % 2 == 0 else list(reversed(ways))
-                turns.append({way: load(ways[way][0], class_name, connections, scheme=ways[way][1], login=ways[way][2])[0]
-                              for way in order})
+                turns.append({})
+                for way in ways if turn % 2 == 0 else reversed(ways):
+                    port, scheme, who = ways[way]
+                    start = processor_time(process.pid)
+                    turns[-1][way] = load(port, class_name, connections, scheme=scheme, login=who)[0]
+                    spent[way].append((processor_time(process.pid) - start) / (turns[-1][way] * SECONDS) * 1e6)
             name = f"{connections} connection{'s' if connections > 1 else ''}"
             for what, way, other, limit in ((f"HTTPS, {name}: requests/s, to those of plain HTTP", "tls", "plain", 0.8),
                                             (f"with a login, {name}: requests/s, to those without", "login", "tls", 0.95)):
                 ratio = statistics.median(turn[way] / turn[other] for turn in turns)
                 best = [max(turn[each] for turn in turns) for each in (way, other)]
-                figures.append(Figure(what, ratio, limit, True, f"at best {best[0]:.0f} / {best[1]:.0f} a second"))
+                least = [min(spent[each]) for each in (way, other)]
+                figures.append(Figure(what, ratio, limit, True, f"at best {best[0]:.0f} / {best[1]:.0f} a second; "
+                                      f"CPU of the server {least[0]:.0f} / {least[1]:.0f} us a request"))
     return figures
 
 
@@ -314,7 +329,7 @@ def waits_beside_intruders(build):
     class_name = "ZORVA_DNSProtocolEndPoint"
     for name, attack in (("wrong logins on 20 connections", intruders.wrong_logins),
                          ("300 half handshakes", intruders.half_handshakes)):
-        with secure_server(build) as (_, port, login):
+        with secure_server(build) as (_, _, port, login):
             def wait():
                 return statistics.median(load(port, class_name, 1, 2, "https", login)[2] for _ in range(5))
 
