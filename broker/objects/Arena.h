@@ -56,12 +56,13 @@ class Arena : util::NotCopied {
     return new (allocate(sizeof(T))) T(std::forward<Args>(args)...);
   }
 
-  /// `count` values of T, value-initialised.
+  /// `count` values of T, value-initialised; at least one, so that the result has an address of its own.
   template <typename T>
   T* makeArray(std::size_t count) {
     static_assert(std::is_trivially_destructible_v<T> && alignof(T) <= kAlignment);
     if (count > kMost / sizeof(T)) throw std::bad_alloc();
-    return new (allocate(count == 0 ? 1 : count * sizeof(T))) T[count == 0 ? 1 : count]();
+    if (count == 0) count = 1;
+    return new (allocate(count * sizeof(T))) T[count]();
   }
 
   /// A copy of `text`, ended by a NUL.

@@ -507,6 +507,13 @@ TEST_F(ObjectsTest, MemoryIsFreedWithTheScope) {
   EXPECT_EQ(cmpi_->mft->cmpiCalloc(cmpi_, SIZE_MAX, 2), nullptr);
 }
 
+TEST_F(ObjectsTest, AnArrayWithoutElementsWritesIntoItsOwnMemory) {
+  Arena arena(nullptr);
+  const auto* const empty = reinterpret_cast<const char*>(arena.makeArray<CMPIData>(0));
+  const auto* const next = static_cast<const char*>(arena.allocate(1));
+  EXPECT_GE(next - empty, static_cast<std::ptrdiff_t>(sizeof(CMPIData)));
+}
+
 TEST_F(ObjectsTest, AnArenaSharesTextsThatRepeat) {
   Arena arena(nullptr);
   EXPECT_EQ(intern(arena, "root/cimv2"), intern(arena, "root/cimv2"));
