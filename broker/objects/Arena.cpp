@@ -11,6 +11,7 @@ Arena::~Arena() {
   while (blocks_ != nullptr) {
     MemoryBlock* block = blocks_;
     blocks_ = block->previous;
+    allowUse(block + 1, block->size);
     if (cache_ == nullptr || !cache_->keep(block)) std::free(block);
   }
 }
@@ -25,13 +26,18 @@ char* Arena::addBlock(std::size_t size) {
   block->previous = blocks_;
   blocks_ = block;
   size_ += sizeof(MemoryBlock) + size;
+  forbidUse(block + 1, size);
   return reinterpret_cast<char*>(block + 1);
 }
 
 void* Arena::takeFromNewBlock(std::size_t size) {
   if (size > kMost) throw std::bad_alloc();
   // A large object gets its own block, so that the room left in the present one is not lost.
-  if (size > next_ / 2) return addBlock(size);
+  if (size > next_ / 2) {
+    char* memory = addBlock(size);
+    allowUse(memory, size);
+    return memory;
+  }
   position_ = addBlock(next_);
   end_ = position_ + next_;
   // Small requests stay small. Later blocks have the size that the cache keeps.

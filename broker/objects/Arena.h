@@ -13,6 +13,7 @@
 #include <type_traits>
 #include <utility>
 
+#include "broker/objects/FreeMemory.h"
 #include "util/NotCopied.h"
 
 namespace zorva::broker {
@@ -90,9 +91,10 @@ class Arena : util::NotCopied {
 
   void* take(std::size_t size) {
     const std::size_t rounded = (size + kAlignment - 1) & ~(kAlignment - 1);
-    if (rounded > static_cast<std::size_t>(end_ - position_)) return takeFromNewBlock(rounded);
+    if (rounded > static_cast<std::size_t>(end_ - position_)) return takeFromNewBlock(size);
     void* memory = position_;
     position_ += rounded;
+    allowUse(memory, size);
     return memory;
   }
   void* takeFromNewBlock(std::size_t size);

@@ -514,6 +514,17 @@ TEST_F(ObjectsTest, AnArrayWithoutElementsWritesIntoItsOwnMemory) {
   EXPECT_GE(next - empty, static_cast<std::ptrdiff_t>(sizeof(CMPIData)));
 }
 
+#ifdef ZORVA_FORBIDS_FREE_MEMORY
+TEST_F(ObjectsTest, AddressSanitizerKnowsWhatAnArenaHasNotGivenOut) {
+  Arena arena(nullptr);
+  for (const std::size_t size : {1U, 24U, 100U, 100000U}) {
+    const auto* const memory = static_cast<const char*>(arena.allocate(size));
+    EXPECT_EQ(__asan_region_is_poisoned(const_cast<char*>(memory), size), nullptr) << size;
+    EXPECT_TRUE(__asan_address_is_poisoned(memory + size)) << size;
+  }
+}
+#endif
+
 TEST_F(ObjectsTest, AnArenaSharesTextsThatRepeat) {
   Arena arena(nullptr);
   EXPECT_EQ(intern(arena, "root/cimv2"), intern(arena, "root/cimv2"));
