@@ -45,10 +45,9 @@ def try_all(directory, url, environment):
     failed = run(*list_of_servers, "eth7", "192.0.2.1")
     expect("dns_servers.py of no interface", re.sub(r"dns_servers.py: 6: .*", "6", failed), "exit status 1: 6\n")
     expect("endpoints.sh", run(HERE / "shell" / "endpoints.sh", url), "eth0\neth1\n")
-    expect("report.sh", run(HERE / "shell" / "report.sh", **environment),
-           "eth0\tEnabled\thost\t192.0.2.53 2001:db8::53\neth1\tEnabled\tifcfg-eth1\t192.0.2.1 192.0.2.2\n")
-    expect("report.sh --url", run(HERE / "shell" / "report.sh", "--url", url, **environment),
-           "eth0\tEnabled\t-\t192.0.2.53 2001:db8::53\neth1\tEnabled\t-\t192.0.2.1 192.0.2.2\n")
+    for where in ([], ["--url", url]):
+        expect("report.sh " + " ".join(where), run(HERE / "shell" / "report.sh", *where, **environment),
+               "eth0\tEnabled\thost\t192.0.2.53 2001:db8::53\neth1\tEnabled\tifcfg-eth1\t192.0.2.1 192.0.2.2\n")
     # The server shows what a source writes with the next request.
     (directory / "list").write_text("eth5 example.org 192.0.2.5\n")
     run(HERE / "source" / "inventory.py", directory / "list", directory / "tree.json")

@@ -7,6 +7,7 @@
 #include "agent/Agent.h"
 #include "agent/files/SettingFiles.h"
 #include "agent/interface/PlatformUtilities.h"
+#include "frontend/SettingOrigins.h"
 #include "frontend/SettingsClaims.h"
 #include "host/HostProvider.h"
 
@@ -17,7 +18,6 @@ namespace {
 using agent::Node;
 using host::HostObject;
 
-constexpr const char* kClass = "ZORVA_DNSSettingOrigin";
 constexpr const char* kPrefix = "SettingOrigin";
 
 void addText(HostObject& object, const char* name, const std::string* text) {
@@ -28,24 +28,8 @@ void addList(HostObject& object, const char* name, const agent::StringList* list
   if (list != nullptr && !list->empty()) object.properties.push_back({name, *list});
 }
 
-/// The endpoint's properties whose values were set.
-agent::StringList setProperties(const Node& node) {
-  constexpr std::pair<agent::PropertyNumber, const char*> kNames[] = {
-      {ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES, "DNSServerAddresses"},
-      {ZV::NodeLexicon::PROP_HOST_NAME, "Hostname"},
-      {ZV::NodeLexicon::PROP_DOMAIN_NAME, "DomainName"},
-      {ZV::NodeLexicon::PROP_DNS_SUFFIXES, "DNSSuffixesToAppend"},
-  };
-  agent::StringList names;
-  for (const auto& [number, name] : kNames) {
-    const agent::Property* property = node.find(number);
-    if (property != nullptr && property->overlaid) names.emplace_back(name);
-  }
-  return names;
-}
-
 HostObject originOf(const std::string& id, const std::string& interface, const agent::SettingFiles& files) {
-  HostObject origin{kClass, {{"InstanceID", id}}, {}};
+  HostObject origin{frontend::kSettingOriginClass, {{"InstanceID", id}}, {}};
   if (interface.empty()) return origin;
   const std::string file = agent::settingFileName(interface);
   origin.properties.push_back({"FileName", file});
@@ -64,7 +48,7 @@ HostObject originOfInterface(const Node& node, const std::string& name, bool isS
                              const agent::SettingFiles& files) {
   HostObject origin = originOf(frontend::settingIdOf(name, isServiceProcessor), name, files);
   addOwner(origin, node);
-  const agent::StringList set = setProperties(node);
+  const agent::StringList set = frontend::setPropertiesOf(node);
   addList(origin, "SetProperties", &set);
   return origin;
 }
@@ -108,7 +92,7 @@ std::vector<HostObject> settingOrigins(const agent::TreeSnapshot& tree) {
 }
 
 void serveSettingOrigins(broker::BrokerOptions& options) {
-  options.registry.add({kClass, kPrefix, "", broker::InstanceMi});
+  options.registry.add({frontend::kSettingOriginClass, kPrefix, "", broker::InstanceMi});
   options.linked.push_back({std::string(kPrefix) + "_Create_InstanceMI", reinterpret_cast<void (*)()>(create)});
 }
 

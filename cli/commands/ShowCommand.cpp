@@ -173,7 +173,7 @@ HostView viewOf(Session& session) {
 /// Rows, to be put together with those of other hosts.
 void writeRows(const HostView& view, const ShowOptions& options, const Layout& layout) {
   std::vector<const InterfaceRow*> rows = shownRows(view, options.all || !options.names.empty());
-  writeTable(interfaceTable(rows, view.hasSources), layout);
+  writeTable(interfaceTable(rows, true), layout);  // the same columns for each host
   if (!options.names.empty()) return;
   Table suffixes({"SUFFIXES OF THE HOST"});
   suffixes.keepRowsOnOneLine({});

@@ -115,4 +115,13 @@ std::string propertyText(const broker::Instance& instance, std::string_view prop
   return value == nullptr || value->isNull ? std::string() : valueText(*value, nullptr);
 }
 
+std::vector<std::string> propertyTexts(const broker::Instance& instance, std::string_view property) {
+  const broker::Value* value = instance.property(property);
+  std::vector<std::string> texts;
+  if (value == nullptr || value->isNull) return texts;
+  if (!value->isArray) return {scalarText(value->scalar)};
+  for (const broker::Scalar& element : value->elements) texts.push_back(scalarText(element));
+  return texts;
+}
+
 }  // namespace zorva::cli

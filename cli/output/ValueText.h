@@ -6,6 +6,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "broker/objects/Value.h"
 
@@ -29,5 +30,8 @@ std::string shortPathText(const broker::ObjectPath& path);
 
 /// If null, the empty text.
 std::string propertyText(const broker::Instance& instance, std::string_view property);
+
+/// The elements of an array as texts, a scalar as one; none if the property is null or missing.
+std::vector<std::string> propertyTexts(const broker::Instance& instance, std::string_view property);
 
 }  // namespace zorva::cli

@@ -1,8 +1,6 @@
 #include "cli/session/HostView.h"
 
 #include <algorithm>
-#include <chrono>
-#include <map>
 #include <memory>
 #include <string_view>
 #include <unordered_map>
@@ -10,11 +8,11 @@
 #include <utility>
 
 #include "agent/Agent.h"
-#include "agent/tree/BmcJson.h"
+#include "agent/files/SettingFiles.h"
 #include "cli/output/Failure.h"
 #include "cli/output/Text.h"
 #include "cli/output/ValueText.h"
-#include "cli/session/SettingFiles.h"
+#include "cli/session/Origins.h"
 
 namespace zorva::cli {
 
@@ -28,19 +26,6 @@ std::optional<std::uint64_t> numberOf(const broker::Instance& instance, std::str
   if (value == nullptr || value->isNull) return std::nullopt;
   const auto* number = std::get_if<std::uint64_t>(&value->scalar);
   return number == nullptr ? std::nullopt : std::optional(*number);
-}
-
-std::vector<std::string> textsOf(const broker::Value& value) {
-  std::vector<std::string> texts;
-  if (value.isNull) return texts;
-  if (!value.isArray) return {scalarText(value.scalar)};
-  for (const broker::Scalar& element : value.elements) texts.push_back(scalarText(element));
-  return texts;
-}
-
-std::vector<std::string> textsOf(const broker::Instance& instance, std::string_view property) {
-  const broker::Value* value = instance.property(property);
-  return value == nullptr ? std::vector<std::string>() : textsOf(*value);
 }
 
 void readState(const broker::Instance& instance, InterfaceRow& row) {
@@ -60,7 +45,7 @@ InterfaceRow rowOfEndpoint(const broker::Instance& instance) {
   row.hostName = propertyText(instance, "Hostname");
   row.endpointDomain = propertyText(instance, "DomainName");
   row.domainName = row.endpointDomain;
-  row.suffixes = textsOf(instance, "DNSSuffixesToAppend");
+  row.suffixes = propertyTexts(instance, "DNSSuffixesToAppend");
   readState(instance, row);
   return row;
 }
@@ -69,103 +54,47 @@ InterfaceRow rowOfEndpoint(const broker::Instance& instance) {
 struct SettingName {
   const char* property;
   bool isList;
-  zorva::agent::PropertyNumber number;  ///< of the host's value; kNoNumber: it is only in the file
+  const char* ofEndpoint;  ///< the endpoint's property with the host's value; null: it is only in the file
 };
-
-constexpr zorva::agent::PropertyNumber kNoNumber = 0;
 
 constexpr SettingName kInterfaceSettings[] = {
-    {"RequestedHostname", false, ZV::NodeLexicon::PROP_HOST_NAME},
-    {"DomainName", false, ZV::NodeLexicon::PROP_DOMAIN_NAME},
-    {"DNSServerAddresses", true, ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES},
-    {"ConfigurationName", false, kNoNumber},
+    {"RequestedHostname", false, "Hostname"},
+    {"DomainName", false, "DomainName"},
+    {"DNSServerAddresses", true, "DNSServerAddresses"},
+    {"ConfigurationName", false, nullptr},
 };
 constexpr SettingName kHostSettings[] = {
-    {"DNSSuffixesToAppend", true, ZV::NodeLexicon::PROP_DNS_SUFFIXES},
-    {"ConfigurationName", false, kNoNumber},
+    {"DNSSuffixesToAppend", true, "DNSSuffixesToAppend"},
+    {"ConfigurationName", false, nullptr},
 };
 
-/// The configurations of a tree by the names of their interfaces; the first of several with one name.
-class Configurations {
- public:
-  explicit Configurations(const zorva::agent::TreeSnapshot& tree) {
-    for (const zorva::agent::Node& node : tree.nodes()) {
-      const std::string* name = node.text(ZV::NodeLexicon::PROP_NAME);
-      if (node.type() != zorva::agent::NodeType::NetworkIPConfig || name == nullptr) continue;
-      const bool isServiceProcessor = tree.systemOf(node).isServiceProcessor();
-      byName_.try_emplace({isServiceProcessor, *name}, &node);
-    }
-  }
+/// Only the file counts if it exists: a key that it lacks is an empty value and not the host's. `origin` may be null.
+SettingSource sourceOf(const SettingName& setting, const Origin* origin, bool hasValue) {
+  if (origin != nullptr && origin->hasFile) return SettingSource::File;
+  if (setting.ofEndpoint == nullptr || !hasValue) return SettingSource::None;
+  const bool isSet = origin != nullptr && std::find(origin->setProperties.begin(), origin->setProperties.end(),
+                                                    setting.ofEndpoint) != origin->setProperties.end();
+  return isSet ? SettingSource::Set : SettingSource::Host;
+}
 
-  /// Null if there is none.
-  const zorva::agent::Node* find(const std::string& interface, bool isServiceProcessor) const {
-    const auto found = byName_.find({isServiceProcessor, interface});
-    return found == byName_.end() ? nullptr : found->second;
-  }
-
- private:
-  std::map<std::pair<bool, std::string_view>, const zorva::agent::Node*> byName_;
-};
-
-/// The tree and the files of this host.
-class LocalFacts {
- public:
-  explicit LocalFacts(const Session& session)
-      : tree_(session.tree()), configurations_(*tree_), files_(findSettingFiles(zorva::agent::dataDirectory())) {}
-
-  const zorva::agent::TreeSnapshot& tree() const { return *tree_; }
-  const zorva::agent::Node* find(const std::string& interface, bool isServiceProcessor) const {
-    return configurations_.find(interface, isServiceProcessor);
-  }
-  bool hasFile(const std::string& interface) const { return files_.has(interface); }
-
-  /// Only the file counts if it exists: a key that it lacks is an empty value and not the host's. `node` may be null.
-  SettingSource sourceOf(const std::string& interface, const zorva::agent::Node* node,
-                         zorva::agent::PropertyNumber number, bool hasValue) const {
-    if (hasFile(interface)) return SettingSource::File;
-    if (number == kNoNumber || !hasValue) return SettingSource::None;
-    const zorva::agent::Property* property = node == nullptr ? nullptr : node->find(number);
-    return property != nullptr && property->overlaid ? SettingSource::Set : SettingSource::Host;
-  }
-
- private:
-  std::shared_ptr<const zorva::agent::TreeSnapshot> tree_;
-  Configurations configurations_;
-  SettingFiles files_;
-};
+/// Null if nothing says.
+const Origin* originOf(const Origins* origins, const std::string& interface, bool isServiceProcessor) {
+  return origins == nullptr ? nullptr : origins->find(interface, isServiceProcessor);
+}
 
 template <std::size_t Size>
 std::vector<SettingRow> settingsOf(const SettingName (&names)[Size], const broker::Instance& instance,
-                                   const std::string& interface, const LocalFacts* local, bool isServiceProcessor) {
-  const zorva::agent::Node* node = local == nullptr ? nullptr : local->find(interface, isServiceProcessor);
+                                   const std::string& interface, const Origins* origins, bool isServiceProcessor) {
+  const Origin* origin = originOf(origins, interface, isServiceProcessor);
   std::vector<SettingRow> rows;
   for (const SettingName& name : names) {
-    SettingRow row{interface, name.property, name.isList, textsOf(instance, name.property), SettingSource::None};
+    SettingRow row{interface, name.property, name.isList, propertyTexts(instance, name.property), SettingSource::None};
     const broker::Value* value = instance.property(name.property);
     const bool hasValue = value != nullptr && !value->isNull;
-    if (local != nullptr) row.source = local->sourceOf(interface, node, name.number, hasValue);
+    if (origins != nullptr) row.source = sourceOf(name, origin, hasValue);
     rows.push_back(std::move(row));
   }
   return rows;
-}
-
-std::uint64_t secondsNow() {
-  const auto now = std::chrono::system_clock::now().time_since_epoch();
-  return static_cast<std::uint64_t>(std::chrono::duration_cast<std::chrono::seconds>(now).count());
-}
-
-OwnerFacts ownerFacts(const zorva::agent::Node& node) {
-  using namespace zorva::agent;
-  return {node.textOrEmpty(kDnsOwner),
-          node.textOrEmpty(kDnsProfile),
-          node.textOrEmpty(kDnsOrigin),
-          node.listOrEmpty(kDnsServersInFull),
-          node.listOrEmpty(kDnsRoutingDomains),
-          node.textOrEmpty(kDnsDefaultRoute),
-          node.textOrEmpty(kDnsOverTls),
-          node.textOrEmpty(kDnssec),
-          node.textOrEmpty(kLlmnr),
-          node.textOrEmpty(kMulticastDns)};
 }
 
 /// The instances of a class; if they cannot be read, the view says why.
@@ -225,23 +154,20 @@ void placeSettings(InterfaceRow& row, std::vector<SettingRow> settings) {
   }
 }
 
-/// What only the tree says.
-void placeFacts(InterfaceRow& row, const LocalFacts& local) {
-  const zorva::agent::Node* node = local.find(row.name, row.isServiceProcessor);
-  if (local.hasFile(row.name)) row.source = SettingSource::File;
-  if (node == nullptr) return;
-  row.facts = ownerFacts(*node);
-  if (row.source == SettingSource::File) {
-    row.hostServers = node->listOrEmpty(ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES);
+void placeOrigin(InterfaceRow& row, const Origin& origin) {
+  row.facts = origin.facts;
+  if (origin.hasFile) {
+    row.source = SettingSource::File;
+    row.hostServers = origin.servers;
     return;
   }
-  const auto& properties = node->properties();
-  const bool isSet = std::any_of(properties.begin(), properties.end(), [](const auto& each) { return each.overlaid; });
   const bool hasValue = row.hasDns() || !row.domainName.empty();
-  row.source = isSet ? SettingSource::Set : hasValue ? SettingSource::Host : SettingSource::None;
+  row.source = !origin.setProperties.empty() ? SettingSource::Set
+               : hasValue                    ? SettingSource::Host
+                                             : SettingSource::None;
 }
 
-void readInterfaces(Session& session, HostView& view, const LocalFacts* local) {
+void readInterfaces(Session& session, HostView& view, const Origins* origins) {
   for (const broker::Instance& instance : askedFor(session, kEndpointClass, view)) {
     view.interfaces.push_back(rowOfEndpoint(instance));
   }
@@ -250,55 +176,24 @@ void readInterfaces(Session& session, HostView& view, const LocalFacts* local) {
     const std::string name = interfaceOfSetting(instance);
     const bool isServiceProcessor = propertyText(instance, "InstanceID").starts_with("BMC%");
     placeSettings(rows.take(name, isServiceProcessor),
-                  settingsOf(kInterfaceSettings, instance, name, local, isServiceProcessor));
+                  settingsOf(kInterfaceSettings, instance, name, origins, isServiceProcessor));
   }
-  if (local != nullptr) {
-    for (InterfaceRow& row : view.interfaces) placeFacts(row, *local);
+  for (InterfaceRow& row : view.interfaces) {
+    if (const Origin* origin = originOf(origins, row.name, row.isServiceProcessor)) placeOrigin(row, *origin);
   }
   std::stable_sort(view.interfaces.begin(), view.interfaces.end(),
                    [](const InterfaceRow& a, const InterfaceRow& b) { return a.name < b.name; });
 }
 
-/// What the node of the host's system says.
-void readSystemNode(const zorva::agent::TreeSnapshot& tree, HostRow& host) {
-  using namespace zorva::agent;
-  const Node* node = tree.ownSystem();
-  if (node == nullptr) return;
-  host.facts = ownerFacts(*node);
-  host.servers = node->listOrEmpty(ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES);
-  host.ownSuffixes = node->listOrEmpty(ZV::NodeLexicon::PROP_DNS_SUFFIXES);
-  host.resolverServers = node->listOrEmpty(kResolverServers);
-  host.resolverNotAsked = node->listOrEmpty(kResolverNotAsked);
-  host.resolverSearch = node->listOrEmpty(kResolverSearch);
-  host.resolverOptions = node->listOrEmpty(kResolverOptions);
-}
-
-std::optional<BmcReading> readingOfBmc(const zorva::agent::TreeSnapshot& tree) {
-  using namespace zorva::agent;
-  for (const Node& node : tree.nodes()) {
-    const unsigned int* at = node.number(kReadAt);
-    const unsigned int* interval = node.number(kReadInterval);
-    if (!node.isServiceProcessor() || at == nullptr || interval == nullptr) continue;
-    BmcState state;
-    state.readAt = *at;
-    state.interval = *interval;
-    const std::uint64_t now = secondsNow();
-    return BmcReading{*at, now > *at ? now - *at : 0, state.isUnknownAt(now), node.textOrEmpty(kReadProblem)};
-  }
-  return std::nullopt;
-}
-
-void readHost(Session& session, HostView& view, const LocalFacts* local) {
+void readHost(Session& session, HostView& view, const Origins* origins) {
   HostRow& host = view.host;
-  host.interface = interfaceOfHostSettings(session).value_or("");
-  if (local != nullptr) {
-    host.hasFile = local->hasFile(host.interface);
-    readSystemNode(local->tree(), host);
-    view.bmc = readingOfBmc(local->tree());
+  if (origins != nullptr) {
+    host = origins->host;
+    view.bmc = origins->bmc;
   }
   for (const broker::Instance& instance : askedFor(session, kGeneralSettingClass, view)) {
-    host.settings = settingsOf(kHostSettings, instance, host.interface, local, false);
-    host.suffixes = textsOf(instance, "DNSSuffixesToAppend");
+    host.settings = settingsOf(kHostSettings, instance, host.interface, origins, false);
+    host.suffixes = propertyTexts(instance, "DNSSuffixesToAppend");
   }
 }
 
@@ -399,15 +294,14 @@ std::string HostRow::place() const { return placeOfHostSettings(interface, hasFi
 HostView readHostView(Session& session, Progress& progress) {
   const Session::Quiet quiet(session);
   HostView view;
-  view.hasSources = !session.isRemote();
-  std::optional<LocalFacts> local;
-  if (!session.isRemote()) local.emplace(session);
-  const LocalFacts* facts = local ? &*local : nullptr;
   progress.step("reading the interfaces");
+  const std::optional<Origins> known = readOrigins(session, view.problems);
+  view.hasSources = known.has_value();
+  const Origins* origins = known ? &*known : nullptr;
   view.systemName = systemNameOf(session, view);
-  readInterfaces(session, view, facts);
+  readInterfaces(session, view, origins);
   progress.step("reading the settings of the host");
-  readHost(session, view, facts);
+  readHost(session, view, origins);
   return view;
 }
 

@@ -1,7 +1,7 @@
 #pragma once
 
-// The first view for a person: the DNS client configuration of the host, read from the providers, and from the tree
-// what CIM does not say.
+// The first view for a person: the DNS client configuration of the host, read from the providers, and where it comes
+// from (Origins.h).
 
 #include <cstdint>
 #include <optional>
@@ -35,7 +35,8 @@ struct SettingRow {
   SettingSource source = SettingSource::None;
 };
 
-/// What an owner of DNS settings says beside the lists; empty where it does not say. The values are the tree's.
+/// What an owner of DNS settings says beside the lists; empty where it does not say. The values are the tree's. A server
+/// tells the first three.
 struct OwnerFacts {
   std::string owner;
   std::string profile;
@@ -76,7 +77,7 @@ struct InterfaceRow {
   std::string from() const;
 };
 
-/// What belongs to the host and to no interface. Without a tree only the suffixes are known.
+/// What belongs to the host and to no interface. A server may tell only the suffixes.
 struct HostRow {
   std::string interface;              ///< whose file has the settings of the host; empty: none, or not known
   bool hasFile = false;               ///< it exists
@@ -110,7 +111,7 @@ struct HostView {
   std::vector<InterfaceRow> interfaces;  ///< in the order of their names
   HostRow host;
   std::optional<BmcReading> bmc;  ///< nothing where zorva-bmc read none
-  bool hasSources = true;         ///< false: owners and the settings' sources are not known, for example with a server
+  bool hasSources = true;         ///< false: a server does not tell the owners and the settings' sources
   std::vector<Problem> problems;  ///< the failed queries; their parts of the view are empty
 
   bool couldAsk(std::string_view className) const;
