@@ -35,8 +35,8 @@ struct SettingRow {
   SettingSource source = SettingSource::None;
 };
 
-/// What an owner of DNS settings says beside the lists; empty where it does not say. The values are the tree's. A server
-/// tells the first three.
+/// What an owner of DNS settings says beside the lists; empty where it does not say. The values are the tree's. A
+/// server tells the first three.
 struct OwnerFacts {
   std::string owner;
   std::string profile;
