@@ -38,7 +38,7 @@ AGENT = [
            "PlaceCursorWithOwners", "BareReadsWithOwners"),
     Figure("reading the whole host, to the raw dumps and file reads that it needs", 2, "agent_bench",
            "ReadHost", "RawDumpsAndReads"),
-    Figure("a log pair below the threshold, to one bounded snprintf of the text", 2.5, "agent_bench",
+    Figure("a log pair below the threshold, to one bounded snprintf of the text", 2, "agent_bench",
            "LogPair", "BoundedPrint"),
     Figure("half an entry line with six pointers, to one bounded snprintf of the text", 1, "agent_bench",
            "EntryLineHalf", "BoundedPrintOfEntry"),
