@@ -11,6 +11,7 @@
 #include "cli/output/ValueText.h"
 #include "cli/session/SettingFiles.h"
 #include "frontend/SettingOrigins.h"
+#include "frontend/SettingsClaims.h"
 
 namespace zorva::cli {
 
@@ -78,7 +79,7 @@ Origins originsOfThisHost(const Session& session) {
     place->second = {files.has(*name), frontend::setPropertiesOf(node), ownerFacts(node),
                      node.listOrEmpty(ZV::NodeLexicon::PROP_DNS_SERVER_ADDRESSES)};
   }
-  origins.host.interface = interfaceOfHostSettings(session).value_or("");
+  origins.host.interface = frontend::interfaceOfHostSettings(*tree).value_or("");
   origins.host.hasFile = files.has(origins.host.interface);
   readSystemNode(*tree, origins.host);
   origins.bmc = readingOfBmc(*tree);

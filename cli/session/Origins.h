@@ -8,7 +8,7 @@
 #include <utility>
 #include <vector>
 
-#include "cli/session/HostView.h"
+#include "cli/session/HostRows.h"
 #include "cli/session/Problems.h"
 #include "cli/session/Session.h"
 
