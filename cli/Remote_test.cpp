@@ -246,8 +246,14 @@ TEST_F(Remote, NeedsNoConfigurationOfTheAgentHere) {
 }
 
 TEST(RemoteShow, SaysWhoOwnsAValueAndWhichWereSet) {
-  const TestHost host({TestHost::port("eth0", R"("dns_owner": "NetworkManager", "dns_profile": "lan")"),
-                       TestHost::port("eth1", R"("dns_owner": "systemd-networkd", "dns_origin": "static")")});
+  const TestHost host;
+  host.writeTree(
+      R"({"system_name": "host1", "nodes": [{"type": "System", "name": "system", "description": "Computer",)"
+      R"("properties": {"dns_owner": "systemd-resolved", "dns_server_addresses": ["192.0.2.98"], "resolver_servers":)"
+      R"(["127.0.0.53"], "resolver_servers_not_asked": ["192.0.2.99"], "resolver_search": ["example.org"]},)"
+      R"("children": [)" +
+      TestHost::port("eth0", R"("dns_owner": "NetworkManager", "dns_profile": "lan")") + "," +
+      TestHost::port("eth1", R"("dns_owner": "systemd-networkd", "dns_origin": "static")") + "]}]}");
   const Outcome set = host.run({"modify", R"(ZORVA_DNSProtocolEndPoint.Name="eth1")", "DomainName=set.example"});
   ASSERT_EQ(set.exitCode, 0) << set.err;
   const TestServer server(host);
@@ -257,7 +263,8 @@ TEST(RemoteShow, SaysWhoOwnsAValueAndWhichWereSet) {
     EXPECT_EQ(host.run(there).out, host.run(words).out);
   }
   EXPECT_THAT(host.run({"show", "--url", server.url()}).out,
-              AllOf(HasSubstr("  NetworkManager, profile lan\n"), HasSubstr("  overlay.json\n")));
+              AllOf(HasSubstr("  NetworkManager, profile lan\n"), HasSubstr("  overlay.json\n"),
+                    HasSubstr("  systemd-resolved asks  192.0.2.98\n")));
   EXPECT_THAT(host.run({"show", "eth1", "--url", server.url()}).out,
               HasSubstr("DomainName          set   set.example\n"));
 }
