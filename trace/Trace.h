@@ -62,7 +62,7 @@ class LineWriter {
   void append(std::string_view text) {
     const std::size_t size = std::min(text.size(), static_cast<std::size_t>(end_ - at_));
     // Not memcpy: the compiler knows that it is short, and makes an instruction of it that takes longer to begin than
-    // the library's function takes to end.
+    // a call of memmove takes to end.
     std::memmove(at_, text.data(), size);
     at_ += size;
   }

@@ -45,7 +45,7 @@ std::vector<broker::Instance> instancesOf(Session& session, std::string_view cla
 std::string interfaceOfSetting(const broker::Instance& setting);
 
 /// The interface whose file has the settings of the host as a whole: that of the first configuration outside a service
-/// processor. Nothing if there is none, and with a server, which does not say.
+/// processor. Nothing if there is none, and with a server: there Origins.h has it.
 std::optional<std::string> interfaceOfHostSettings(const Session& session);
 
 }  // namespace zorva::cli
